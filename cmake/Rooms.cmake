@@ -1,0 +1,104 @@
+# The rooms of the house: how a library is built, and who may include whom.
+#
+# A room's headers are reachable through its target alone. Since each room has
+# an include directory of its own and libraries are linked PRIVATE or PUBLIC as
+# their headers need, including a header of a room that is not linked does not
+# compile.
+
+set(ZR_WARNINGS
+    -Wall -Wextra -Wpedantic -Werror
+    -Wconversion -Wsign-conversion -Wshadow -Wnull-dereference
+    -Wcast-align -Wcast-qual -Wformat=2 -Wimplicit-fallthrough -Wundef)
+set(ZR_CXX_WARNINGS
+    -Wold-style-cast -Woverloaded-virtual -Wnon-virtual-dtor -Wextra-semi)
+# g++ 12 sees overlapping copies in std::string's operator+ where there are none.
+set(ZR_GNU_WARNINGS -Wduplicated-branches -Wduplicated-cond -Wlogical-op -Wno-restrict)
+
+add_library(zr_options INTERFACE)
+target_compile_options(zr_options INTERFACE
+    ${ZR_WARNINGS}
+    $<$<COMPILE_LANGUAGE:CXX>:${ZR_CXX_WARNINGS}>
+    $<$<CXX_COMPILER_ID:GNU>:${ZR_GNU_WARNINGS}>)
+
+if(ZR_SANITIZERS)
+    add_compile_options(-fsanitize=${ZR_SANITIZERS} -fno-sanitize-recover=all
+                        -fno-omit-frame-pointer -O1)
+    add_link_options(-fsanitize=${ZR_SANITIZERS})
+    add_compile_definitions(ZR_SANITIZERS="${ZR_SANITIZERS}")
+endif()
+if(ZR_COVERAGE)
+    add_compile_options(--coverage -O0)
+    add_link_options(--coverage)
+endif()
+
+# zr_room(NAME SOURCES file... [LINKS target...] [PRIVATE_LINKS target...])
+# A static library whose public headers are under include/.
+function(zr_room name)
+    cmake_parse_arguments(ROOM "" "" "SOURCES;LINKS;PRIVATE_LINKS" ${ARGN})
+    add_library(${name} STATIC ${ROOM_SOURCES})
+    target_include_directories(${name} PUBLIC include PRIVATE src)
+    target_link_libraries(${name} PUBLIC ${ROOM_LINKS} PRIVATE zr_options ${ROOM_PRIVATE_LINKS})
+endfunction()
+
+# zr_provider_library(NAME OBJECTS target EXPORTS symbol...)
+# A CMPI provider library, made of an object library, that exports exactly the
+# symbols named.
+function(zr_provider_library name)
+    cmake_parse_arguments(LIBRARY "" "" "OBJECTS;EXPORTS" ${ARGN})
+    set(map ${CMAKE_CURRENT_BINARY_DIR}/${name}.map)
+    list(JOIN LIBRARY_EXPORTS "; " exports)
+    file(CONFIGURE OUTPUT ${map} CONTENT "{ global: @exports@; local: *; };\n" @ONLY)
+    add_library(${name} MODULE $<TARGET_OBJECTS:${LIBRARY_OBJECTS}>)
+    target_link_libraries(${name} PRIVATE zr_options ${LIBRARY_OBJECTS})
+    set_target_properties(${name} PROPERTIES LINK_DEPENDS ${map}
+                          LIBRARY_OUTPUT_DIRECTORY ${PROJECT_BINARY_DIR}/lib/cmpi)
+    target_link_options(${name} PRIVATE -Wl,--version-script=${map} -Wl,--gc-sections)
+    if(NOT ZR_SANITIZERS)
+        target_link_options(${name} PRIVATE -Wl,--no-undefined)
+    endif()
+    install(TARGETS ${name} LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR}/cmpi)
+endfunction()
+
+# What tests are built for is to run once: optimising them costs more than it saves.
+# g++ 12 sees null pointers in the standard library's streams where there are none.
+add_library(test_options INTERFACE)
+target_compile_options(test_options INTERFACE
+    $<$<CONFIG:Release>:-O1> $<$<CXX_COMPILER_ID:GNU>:-Wno-null-dereference>)
+
+# The headers that every test includes, compiled once: most of a test's compile
+# time would go into them.
+function(zr_test_headers)
+    file(CONFIGURE OUTPUT ${CMAKE_BINARY_DIR}/test_headers.cpp CONTENT "int main() {}\n")
+    add_executable(test_headers ${CMAKE_BINARY_DIR}/test_headers.cpp)
+    target_link_libraries(test_headers PRIVATE zr_options test_options GTest::gtest GTest::gmock)
+    target_compile_definitions(test_headers PRIVATE ZR_SOURCE_DIR="${PROJECT_SOURCE_DIR}"
+                               ZR_BINARY_DIR="${PROJECT_BINARY_DIR}")
+    target_precompile_headers(test_headers PRIVATE <gmock/gmock.h> <gtest/gtest.h>)
+endfunction()
+
+# zr_test(NAME SOURCES file... [LINKS target...] [LABELS label...] [ENVIRONMENT NAME=value...])
+# One test program; each of its tests is a test of its own to ctest.
+function(zr_test name)
+    cmake_parse_arguments(TEST "" "" "SOURCES;LINKS;LABELS;ENVIRONMENT" ${ARGN})
+    if(NOT TARGET test_headers)
+        zr_test_headers()
+    endif()
+    add_executable(${name} ${TEST_SOURCES})
+    # A program with C sources would want the same headers for C.
+    if(NOT TEST_SOURCES MATCHES "\\.c(;|$)")
+        target_precompile_headers(${name} REUSE_FROM test_headers)
+    endif()
+    target_link_libraries(${name} PRIVATE zr_options test_options ${TEST_LINKS} GTest::gtest GTest::gmock
+                          GTest::gtest_main)
+    target_compile_definitions(${name} PRIVATE ZR_SOURCE_DIR="${PROJECT_SOURCE_DIR}"
+                               ZR_BINARY_DIR="${PROJECT_BINARY_DIR}")
+    set(properties TIMEOUT 120)
+    if(TEST_LABELS)
+        list(APPEND properties LABELS "${TEST_LABELS}")
+    endif()
+    if(TEST_ENVIRONMENT)
+        list(APPEND properties ENVIRONMENT "${TEST_ENVIRONMENT}")
+    endif()
+    gtest_discover_tests(${name} DISCOVERY_MODE PRE_TEST PROPERTIES ${properties})
+endfunction()
+include(GoogleTest)
