@@ -1,0 +1,38 @@
+#pragma once
+
+#include <functional>
+#include <string>
+#include <vector>
+
+namespace ZR {
+
+/// The settings of the platform: read once per process from the file that the
+/// environment variable ZR_CONFIG names, else from /etc/zr/platform.conf; a
+/// setting KEY is overridden by the environment variable ZR_KEY.
+struct PlatformSettings {
+    static constexpr int defaultLevel = 6000;
+
+    std::string dataDir;              ///< DATA_DIR; always ends with "/"
+    std::string instrumentationTree;  ///< INSTRUMENTATION_TREE; empty: the live machine
+    int logLevel = defaultLevel;      ///< LOG_LEVEL: lines of this level or above are kept
+    int traceLevel = defaultLevel;    ///< TRACE_LEVEL
+    std::string logSink = "syslog";   ///< LOG_SINK: none, stderr, syslog, file:PATH
+    std::string traceSink = "none";   ///< TRACE_SINK
+
+    /// What could not be used, one text each with its file and line or its
+    /// variable; the setting then has its default.
+    std::vector<std::string> complaints;
+
+    bool operator==(const PlatformSettings&) const = default;
+
+    /// The settings of this process. Read at the first call; safe on any thread.
+    static const PlatformSettings& process();
+
+    /// Looks up an environment variable: null when it is not set.
+    using Environment = std::function<const char*(const char*)>;
+
+    /// Reads the settings as process() does, from the environment given.
+    [[nodiscard]] static PlatformSettings read(const Environment& environment);
+};
+
+}  // namespace ZR

@@ -1,0 +1,87 @@
+#include "zrcommon/File.h"
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cerrno>
+
+#include "zrcommon/Strings.h"
+#include "zrcommon/UniqueFd.h"
+
+namespace ZR {
+
+File::Path::Path(std::wstring_view wide) : bytes_(make_string(wide)) {}
+
+std::wstring File::Path::wide() const {
+    return make_wstring(bytes_);
+}
+
+namespace {
+
+/// The system's functions would take what stands before a zero byte for the name.
+bool isName(const std::string& path) {
+    if (path.find('\0') == std::string::npos) {
+        return true;
+    }
+    errno = ENOENT;
+    return false;
+}
+
+}  // namespace
+
+bool File::exists(const std::wstring& path) {
+    const std::string name = make_string(path);
+    struct stat status {};
+    return isName(name) && ::stat(name.c_str(), &status) == 0;
+}
+
+std::optional<std::string> File::read(const std::string& path, std::size_t limit) {
+    if (!isName(path)) {
+        return std::nullopt;
+    }
+    // Non-blocking, so that a pipe in the file's place cannot hang the caller.
+    const UniqueFd fd{::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY)};
+    struct stat status {};
+    if (!fd || ::fstat(fd.get(), &status) != 0) {
+        return std::nullopt;
+    }
+    if (!S_ISREG(status.st_mode)) {
+        errno = S_ISDIR(status.st_mode) ? EISDIR : EINVAL;
+        return std::nullopt;
+    }
+    // A size that is too large is met before any room is taken for it.
+    const auto size = static_cast<std::size_t>(status.st_size);
+    if (size > limit) {
+        errno = EFBIG;
+        return std::nullopt;
+    }
+    // One byte more than the size shows that the file ends there; files of /proc
+    // and /sys tell no size.
+    std::string content(std::max<std::size_t>(size + 1, 4096), '\0');
+    std::size_t filled = 0;
+    for (;;) {
+        ssize_t got = 0;
+        do {
+            got = ::read(fd.get(), content.data() + filled, content.size() - filled);
+        } while (got < 0 && errno == EINTR);
+        if (got < 0) {
+            return std::nullopt;
+        }
+        filled += static_cast<std::size_t>(got);
+        if (filled > limit) {
+            errno = EFBIG;
+            return std::nullopt;
+        }
+        if (got == 0) {
+            content.resize(filled);
+            return content;
+        }
+        if (filled == content.size()) {
+            content.resize(2 * filled);
+        }
+    }
+}
+
+}  // namespace ZR

@@ -1,0 +1,162 @@
+#include "zrcommon/PlatformSettings.h"
+
+#include <sys/stat.h>
+
+#include <array>
+#include <cerrno>
+#include <charconv>
+#include <cstdlib>
+#include <cstring>
+#include <string_view>
+
+#include "zrcommon/File.h"
+#include "zrcommon/PropertyFile.h"
+
+namespace ZR {
+
+namespace {
+
+constexpr const char* defaultFile = "/etc/zr/platform.conf";
+
+/// Takes a text into a setting; answers what is wrong with it, or null. The
+/// setting has its default when something is: a complaint about a value must not
+/// leave an earlier one in force.
+using Apply = const char* (*)(std::string_view value, PlatformSettings& settings);
+
+template <auto setting>
+void setDefault(PlatformSettings& settings) {
+    settings.*setting = PlatformSettings{}.*setting;
+}
+
+template <auto level>
+const char* applyLevel(std::string_view value, PlatformSettings& settings) {
+    int number = 0;
+    const auto [end, error] = std::from_chars(value.data(), value.data() + value.size(), number);
+    if (error != std::errc{} || end != value.data() + value.size() || number < 0) {
+        setDefault<level>(settings);
+        return "not a level (a number from 0)";
+    }
+    settings.*level = number;
+    return nullptr;
+}
+
+template <auto sink>
+const char* applySink(std::string_view value, PlatformSettings& settings) {
+    constexpr std::string_view file = "file:";
+    const bool plain = value == "none" || value == "stderr" || value == "syslog";
+    if (!plain && !(value.starts_with(file) && value.size() > file.size())) {
+        setDefault<sink>(settings);
+        return "not a sink (none, stderr, syslog or file:PATH)";
+    }
+    settings.*sink = value;
+    return nullptr;
+}
+
+const char* applyDataDir(std::string_view value, PlatformSettings& settings) {
+    settings.dataDir = value;  // empty: the default, which is looked for at the end
+    return value.empty() ? "not a directory (empty)" : nullptr;
+}
+
+const char* applyTree(std::string_view value, PlatformSettings& settings) {
+    settings.instrumentationTree = value;
+    return nullptr;
+}
+
+struct Setting {
+    const char* key;
+    const char* variable;
+    Apply apply;
+};
+
+constexpr std::array<Setting, 6> settingTable{{
+    {"DATA_DIR", "ZR_DATA_DIR", &applyDataDir},
+    {"INSTRUMENTATION_TREE", "ZR_INSTRUMENTATION_TREE", &applyTree},
+    {"LOG_LEVEL", "ZR_LOG_LEVEL", &applyLevel<&PlatformSettings::logLevel>},
+    {"TRACE_LEVEL", "ZR_TRACE_LEVEL", &applyLevel<&PlatformSettings::traceLevel>},
+    {"LOG_SINK", "ZR_LOG_SINK", &applySink<&PlatformSettings::logSink>},
+    {"TRACE_SINK", "ZR_TRACE_SINK", &applySink<&PlatformSettings::traceSink>},
+}};
+
+std::string quoted(std::string_view text) {
+    return "\"" + std::string(text) + "\"";
+}
+
+void readFile(const std::string& file, bool mustExist, PlatformSettings& settings) {
+    const auto content = File::read(file);
+    if (!content) {
+        if (mustExist || errno != ENOENT) {
+            settings.complaints.push_back(file + ": " + std::strerror(errno));
+        }
+        return;
+    }
+    for (const PropertyLine& line : parsePropertyLines(*content)) {
+        const std::string place = file + ":" + std::to_string(line.line) + ": ";
+        if (line.key.empty()) {
+            settings.complaints.push_back(place + "no KEY=value line: " + quoted(line.value));
+            continue;
+        }
+        const char* complaint = "no such setting";
+        for (const Setting& setting : settingTable) {
+            if (line.key == setting.key) {
+                complaint = setting.apply(line.value, settings);
+            }
+        }
+        if (complaint != nullptr) {
+            settings.complaints.push_back(place + line.key + "=" + quoted(line.value) + ": " +
+                                          complaint);
+        }
+    }
+}
+
+/// The first of the usual directories of ifcfg files that exists, else our own.
+std::string defaultDataDir() {
+    constexpr std::array directories{
+        "/etc/sysconfig/network-scripts/",
+        "/etc/sysconfig/network/",
+        "/var/lib/dhcp-client-provider/",
+    };
+    for (const char* directory : directories) {
+        struct stat status {};
+        if (::stat(directory, &status) == 0 && S_ISDIR(status.st_mode)) {
+            return directory;
+        }
+    }
+    return directories.back();
+}
+
+}  // namespace
+
+PlatformSettings PlatformSettings::read(const Environment& environment) {
+    PlatformSettings settings;
+    const char* file = environment("ZR_CONFIG");
+    if (file != nullptr && *file == '\0') {
+        settings.complaints.emplace_back("ZR_CONFIG=\"\": not a file (empty)");
+    } else {
+        readFile(file != nullptr ? file : defaultFile, file != nullptr, settings);
+    }
+    for (const Setting& setting : settingTable) {
+        const char* value = environment(setting.variable);
+        if (value == nullptr) {
+            continue;
+        }
+        if (const char* complaint = setting.apply(value, settings)) {
+            settings.complaints.push_back(std::string(setting.variable) + "=" + quoted(value) +
+                                          ": " + complaint);
+        }
+    }
+    if (settings.dataDir.empty()) {
+        settings.dataDir = defaultDataDir();
+    }
+    if (settings.dataDir.back() != '/') {
+        settings.dataDir += '/';
+    }
+    return settings;
+}
+
+const PlatformSettings& PlatformSettings::process() {
+    static const PlatformSettings settings =
+        read([](const char* name) { return std::getenv(name); });
+    return settings;
+}
+
+}  // namespace ZR

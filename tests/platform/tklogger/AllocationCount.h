@@ -1,0 +1,18 @@
+#pragma once
+
+#include <cstddef>
+
+namespace TKLog::Testing {
+
+/// Whether this build counts: the thread sanitizer of clang lets nobody replace
+/// operator new.
+#ifdef ALLOCATIONS_NOT_COUNTED
+inline constexpr bool countsAllocations = false;
+#else
+inline constexpr bool countsAllocations = true;
+#endif
+
+/// How often this thread has called operator new so far.
+std::size_t allocationsOfThisThread() noexcept;
+
+}  // namespace TKLog::Testing

@@ -1,0 +1,189 @@
+#include "zrcommon/File.h"
+
+#include <fcntl.h>
+#include <gtest/gtest.h>
+#include <sys/resource.h>
+#include <sys/socket.h>
+#include <sys/stat.h>
+#include <sys/un.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstring>
+#include <string>
+
+#include "support/ChildProcess.h"
+#include "support/Files.h"
+#include "support/TemporaryDirectory.h"
+#include "zrcommon/Strings.h"
+#include "zrcommon/UniqueFd.h"
+
+namespace ZR {
+
+namespace {
+
+using Testing::inChild;
+using Testing::TemporaryDirectory;
+using Testing::writeFile;
+
+/// Reads a file that must be refused; answers why it was.
+int reasonOf(const std::string& path, std::size_t limit = 1U << 20U) {
+    errno = 0;
+    const auto content = File::read(path, limit);
+    const int reason = errno;
+    EXPECT_FALSE(content.has_value());
+    return reason;
+}
+
+class FileTest : public testing::Test {
+  protected:
+    TemporaryDirectory directory_;
+    std::string path_ = directory_ / "file";
+};
+
+TEST_F(FileTest, ReadsEveryByte) {
+    std::string bytes;
+    for (int i = 0; i < 70000; ++i) {
+        bytes.push_back(static_cast<char>(i * 7));
+    }
+    writeFile(path_, bytes);
+    EXPECT_EQ(File::read(path_), bytes);
+}
+
+TEST_F(FileTest, ReadsSizesAroundThatOfItsFirstPiece) {
+    for (const std::size_t size : {0U, 1U, 4095U, 4096U, 4097U, 8191U, 8192U}) {
+        const std::string bytes(size, 'x');
+        writeFile(path_, bytes);
+        EXPECT_EQ(File::read(path_), bytes) << size;
+    }
+}
+
+TEST_F(FileTest, LimitIsTheLargestSizeThatIsRead) {
+    writeFile(path_, std::string(5000, 'x'));
+    EXPECT_EQ(File::read(path_, 5000), std::string(5000, 'x'));
+    EXPECT_EQ(reasonOf(path_, 4999), EFBIG);
+    writeFile(path_, "");
+    EXPECT_EQ(File::read(path_, 0), "");
+}
+
+TEST_F(FileTest, FileThatIsTooLargeCostsNoMemory) {
+    {
+        const UniqueFd fd{::open(path_.c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600)};
+        ASSERT_TRUE(fd);
+        if (::ftruncate(fd.get(), off_t{1} << 40U) != 0) {
+            GTEST_SKIP() << "no sparse files here: " << std::strerror(errno);
+        }
+    }
+    EXPECT_EQ(reasonOf(path_), EFBIG);
+}
+
+TEST_F(FileTest, LimitHoldsForFilesThatTellNoSize) {
+    EXPECT_EQ(reasonOf("/proc/self/maps", 10), EFBIG);
+}
+
+TEST_F(FileTest, ReadsFilesOfTheKernelWhole) {
+    const auto status = File::read("/proc/self/status");
+    ASSERT_TRUE(status.has_value());
+    EXPECT_EQ(status->substr(0, 6), "Name:\t");
+    EXPECT_EQ(status->back(), '\n');
+
+    // Longer than the first piece.
+    const auto symbols = File::read("/proc/kallsyms");
+    if (symbols && symbols->size() > 8192) {
+        EXPECT_EQ(symbols->back(), '\n');
+    }
+}
+
+TEST_F(FileTest, MissingFileIsNotRead) {
+    EXPECT_EQ(reasonOf(path_), ENOENT);
+}
+
+TEST_F(FileTest, DirectoryIsNotRead) {
+    EXPECT_EQ(reasonOf(directory_.path().string()), EISDIR);
+}
+
+TEST_F(FileTest, PipeWithoutAWriterDoesNotHang) {
+    ASSERT_EQ(::mkfifo(path_.c_str(), 0600), 0);
+    ::alarm(20);  // ends the program, should the call hang
+    EXPECT_EQ(reasonOf(path_), EINVAL);
+    ::alarm(0);
+}
+
+TEST_F(FileTest, DeviceIsNotRead) {
+    EXPECT_EQ(reasonOf("/dev/zero"), EINVAL);
+}
+
+TEST_F(FileTest, SocketIsNotRead) {
+    const UniqueFd fd{::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0)};
+    sockaddr_un address{};
+    address.sun_family = AF_UNIX;
+    ASSERT_LT(path_.size(), sizeof address.sun_path);
+    std::memcpy(address.sun_path, path_.c_str(), path_.size() + 1);
+    ASSERT_EQ(::bind(fd.get(), reinterpret_cast<const sockaddr*>(&address), sizeof address), 0);
+    EXPECT_EQ(reasonOf(path_), ENXIO);
+}
+
+TEST_F(FileTest, FileWithoutPermissionIsNotRead) {
+    writeFile(path_, "secret");
+    ASSERT_EQ(::chmod(path_.c_str(), 0), 0);
+    const auto result = inChild([this] {
+        // The root user may read everything; nobody may not.
+        if (::geteuid() == 0 && (::chmod(directory_.path().c_str(), 0755) != 0 ||
+                                 ::setresuid(65534, 65534, 65534) != 0)) {
+            return std::string("cannot become nobody");
+        }
+        return std::string(std::strerror(reasonOf(path_)));
+    });
+    EXPECT_EQ(result.output, "Permission denied");
+}
+
+TEST_F(FileTest, NothingButTheWholeNameNamesAFile) {
+    writeFile(path_, "x");
+    const std::string cut = path_ + '\0' + "y";
+    EXPECT_EQ(reasonOf(cut), ENOENT);
+    EXPECT_FALSE(File::exists(make_wstring(cut)));
+}
+
+TEST_F(FileTest, ReadingLeavesNoDescriptorOpen) {
+    writeFile(path_, "x");
+    const auto next = [] { return UniqueFd{::open("/dev/null", O_RDONLY | O_CLOEXEC)}.get(); };
+    const int before = next();
+    for (int i = 0; i < 3; ++i) {
+        EXPECT_TRUE(File::read(path_).has_value());
+        EXPECT_EQ(reasonOf(directory_.path().string()), EISDIR);
+        EXPECT_EQ(reasonOf("/proc/self/maps", 10), EFBIG);
+    }
+    EXPECT_EQ(next(), before);
+}
+
+TEST_F(FileTest, WhateverHasTheNameExists) {
+    writeFile(path_, "");
+    EXPECT_TRUE(File::exists(make_wstring(path_)));
+    EXPECT_TRUE(File::exists(make_wstring(directory_.path().string())));
+    EXPECT_TRUE(File::exists(L"/dev/null"));
+    EXPECT_FALSE(File::exists(make_wstring(directory_ / "missing")));
+    EXPECT_FALSE(File::exists(make_wstring(path_ + "/below a file")));
+    EXPECT_FALSE(File::exists(L""));
+}
+
+TEST_F(FileTest, LinkThatLeadsNowhereDoesNotExist) {
+    ASSERT_EQ(::symlink("missing", path_.c_str()), 0);
+    EXPECT_FALSE(File::exists(make_wstring(path_)));
+}
+
+TEST_F(FileTest, NamesNeedNotBeText) {
+    const std::string name = directory_ / "a\xFF\xC3";
+    writeFile(name, "x");
+    EXPECT_TRUE(File::exists(make_wstring(name)));
+    EXPECT_EQ(File::read(name), "x");
+}
+
+TEST(FilePath, HasAFormForTheSystemAndOneForCallers) {
+    EXPECT_EQ(File::Path(std::string("/a\xC3\x9F\xFF")).wide(),
+              (std::wstring{L'/', L'a', L'\u00DF', wchar_t{0xDCFF}}));
+    EXPECT_EQ(File::Path(std::wstring_view(L"/a\u00DF")).bytes(), "/a\xC3\x9F");
+}
+
+}  // namespace
+
+}  // namespace ZR
