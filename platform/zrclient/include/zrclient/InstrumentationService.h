@@ -1,0 +1,51 @@
+#pragma once
+
+#include <atomic>
+#include <cstdint>
+#include <memory>
+#include <mutex>
+
+#include "zrclient/Snapshot.h"
+#include "zrclient/SnapshotSource.h"
+
+namespace ZR {
+
+/// Keeps the newest snapshot for the process. Safe to use from many threads.
+///
+/// Nothing is read ahead of the first request, no thread is started, and with
+/// nothing changed a snapshot is handed out for the price of one poll.
+class InstrumentationService {
+  public:
+    /// The service of this process (of this library, when linked into one). Its
+    /// source is what the platform settings name, opened on first use.
+    static InstrumentationService& process();
+
+    explicit InstrumentationService(std::unique_ptr<SnapshotSource> source = nullptr);
+
+    /// The newest state: polls the source, and reads it when it changed.
+    [[nodiscard]] std::shared_ptr<const Snapshot> current();
+
+    /// The state that was read last, without polling; reads once if there is none.
+    [[nodiscard]] std::shared_ptr<const Snapshot> latest();
+
+    /// Replaces the source; the next current() reads it. Cursors keep what they hold.
+    void useSource(std::unique_ptr<SnapshotSource> source);
+
+    /// How often a source was read since the start.
+    [[nodiscard]] std::uint64_t readings() const noexcept { return readings_.load(); }
+
+  private:
+    [[nodiscard]] std::shared_ptr<const Snapshot> published();
+    std::shared_ptr<const Snapshot> readSource();
+
+    // Two locks, so that latest() never waits for a reading under way. The first
+    // is held while the source is asked, the second only to copy or swap the
+    // pointer; who takes both takes them in this order.
+    std::mutex sourceMutex_;
+    std::unique_ptr<SnapshotSource> source_;
+    std::mutex snapshotMutex_;
+    std::shared_ptr<const Snapshot> snapshot_;
+    std::atomic<std::uint64_t> readings_{0};
+};
+
+}  // namespace ZR

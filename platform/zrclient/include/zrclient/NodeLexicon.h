@@ -1,0 +1,56 @@
+#pragma once
+
+#include <array>
+#include <string_view>
+
+/// The numbering of node types and properties that the instrumentation tree and
+/// its users share. The numbers are fixed; clients pass them, never the texts.
+namespace ZR::NodeLexicon {
+
+enum class NodeType : unsigned short {
+    NetworkInterface = 29,  ///< one node per network interface
+    ComputerSystem = 40,    ///< one node per computer: the host, or its service processor
+};
+
+enum class Properties : unsigned short {
+    AddressSource = 24,        ///< unsigned int: how the address was obtained; 1 is DHCP
+    IPv4Address = 25,          ///< string: the interface's IPv4 address, dotted
+    DHCPServerAddresses = 93,  ///< list of strings: addresses of the DHCP servers
+    Name = 108,                ///< string: interface name, or a computer's name
+    NameMaxLength = 109,       ///< unsigned int: maximum length of the name, in bytes
+    InterfaceState = 123,      ///< unsigned int: 1 is active
+    DHCPEnabled = 186,         ///< bool: the interface takes its address from DHCP
+};
+
+/// Values of Properties::AddressSource.
+enum class AddressSource : unsigned int {
+    Unknown = 0,
+    DHCP = 1,
+    BOOTP = 2,
+    Static = 3,
+    LinkLocal = 4,
+    Other = 5,
+};
+
+template <typename Number>
+struct Entry {
+    Number number;
+    std::string_view name;
+};
+
+inline constexpr std::array<Entry<NodeType>, 2> nodeTypes{{
+    {NodeType::NetworkInterface, "NetworkInterface"},
+    {NodeType::ComputerSystem, "ComputerSystem"},
+}};
+
+inline constexpr std::array<Entry<Properties>, 7> properties{{
+    {Properties::AddressSource, "AddressSource"},
+    {Properties::IPv4Address, "IPv4Address"},
+    {Properties::DHCPServerAddresses, "DHCPServerAddresses"},
+    {Properties::Name, "Name"},
+    {Properties::NameMaxLength, "NameMaxLength"},
+    {Properties::InterfaceState, "InterfaceState"},
+    {Properties::DHCPEnabled, "DHCPEnabled"},
+}};
+
+}  // namespace ZR::NodeLexicon

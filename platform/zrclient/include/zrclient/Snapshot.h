@@ -1,0 +1,109 @@
+#pragma once
+
+#include <cstdint>
+#include <memory>
+#include <span>
+#include <string>
+#include <string_view>
+#include <variant>
+#include <vector>
+
+#include "zrclient/NodeLexicon.h"
+
+namespace ZR {
+
+/// The value of one property. std::monostate is a value that no reader can
+/// take: it is present (isPropertyReadOnly answers) but unreadable.
+using PropertyValue =
+    std::variant<std::monostate, bool, std::uint64_t, std::string, std::vector<std::string>>;
+
+struct SnapshotProperty {
+    NodeLexicon::Properties id{};
+    bool readOnly = false;
+    PropertyValue value;
+
+    bool operator==(const SnapshotProperty&) const = default;
+};
+
+/// One state of the instrumentation tree. Immutable once built, so that any
+/// number of cursors on any number of threads may stand on it at once; it is
+/// shared by std::shared_ptr and ends with its last cursor.
+///
+/// Nodes lie in one flat array in document order, depth first. Index `none`
+/// stands for no node.
+class Snapshot {
+  public:
+    using Index = std::uint32_t;
+    static constexpr Index none = UINT32_MAX;
+
+    struct Node {
+        std::string type;         ///< a lexicon name, or any other text
+        std::string description;  ///< node description
+        std::string key;          ///< this node's segment of a path, unique among its siblings;
+                                  ///< a "/" or "%" in it is written %2F or %25
+        Index parent = none;
+        Index nextOfType = none;  ///< next node of the same lexicon type in document order
+        std::uint32_t firstProperty = 0;
+        std::uint32_t propertyCount = 0;
+
+        bool operator==(const Node&) const = default;
+    };
+
+    [[nodiscard]] std::span<const Node> nodes() const noexcept { return nodes_; }
+    [[nodiscard]] const Node& node(Index index) const { return nodes_[index]; }
+    [[nodiscard]] std::span<const SnapshotProperty> properties(Index index) const;
+
+    /// The property of a node, or null. O(properties of the node).
+    [[nodiscard]] const SnapshotProperty* find(Index index, NodeLexicon::Properties id) const;
+
+    /// First node of a lexicon type in document order, or none. O(1).
+    [[nodiscard]] Index first(NodeLexicon::NodeType type) const noexcept;
+
+    /// The path of a node: the keys from the root down, each after a "/". O(depth).
+    [[nodiscard]] std::string path(Index index) const;
+
+    /// The node that a path names, or none. O(depth).
+    [[nodiscard]] Index resolve(std::string_view path) const noexcept;
+
+    /// How many keys resolve() compared on this thread so far: the unit in which
+    /// the look-up of paths is measured.
+    [[nodiscard]] static std::uint64_t keyComparisons() noexcept;
+
+    /// Equal nodes with equal properties in equal order.
+    bool operator==(const Snapshot&) const = default;
+
+  private:
+    friend class SnapshotBuilder;
+    Snapshot() = default;
+
+    [[nodiscard]] bool isPathOf(std::string_view path, Index index) const noexcept;
+
+    std::vector<Node> nodes_;
+    std::vector<SnapshotProperty> properties_;
+    std::vector<Index> pathIndex_;  // open addressing by the hash of the path
+    Index firstNetworkInterface_ = none;
+    Index firstComputerSystem_ = none;
+};
+
+/// Builds a snapshot in document order: add a node after its parent and before
+/// its later siblings' subtrees; its properties follow before the next node.
+class SnapshotBuilder {
+  public:
+    /// Adds a node below `parent` (Snapshot::none: a root). The key of its path
+    /// segment is its Name property when that is a text, else its description;
+    /// from the second sibling of one key on, "#2", "#3"... is put behind it.
+    Snapshot::Index add(Snapshot::Index parent, std::string type, std::string description);
+
+    /// Adds a property to the node added last. One that is there already is
+    /// replaced in its place. Without a node there is nothing to add to.
+    void property(NodeLexicon::Properties id, PropertyValue value, bool readOnly = false);
+
+    /// The finished snapshot; the builder is empty afterwards.
+    [[nodiscard]] std::shared_ptr<const Snapshot> build();
+
+  private:
+    std::vector<Snapshot::Node> nodes_;
+    std::vector<SnapshotProperty> properties_;
+};
+
+}  // namespace ZR

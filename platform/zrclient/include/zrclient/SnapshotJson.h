@@ -1,0 +1,16 @@
+#pragma once
+
+#include <string>
+
+#include "zrclient/Snapshot.h"
+
+namespace ZR {
+
+/// A snapshot as a JSON tree, indented by two blanks per level, with a line feed
+/// at its end: a file of this text is read back as an equal snapshot, as long as
+/// its nodes are at most 64 levels deep and its texts are UTF-8 without
+/// "${HOSTNAME}". Bytes that are no UTF-8 become U+FFFD, so that the result is
+/// JSON whatever the snapshot holds. An unreadable value becomes null.
+[[nodiscard]] std::string toJson(const Snapshot& snapshot);
+
+}  // namespace ZR

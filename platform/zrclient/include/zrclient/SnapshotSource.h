@@ -1,0 +1,27 @@
+#pragma once
+
+#include <memory>
+
+namespace ZR {
+
+class Snapshot;
+
+/// Where snapshots come from: a file, or the live machine. The service calls a
+/// source from one thread at a time.
+class SnapshotSource {
+  public:
+    SnapshotSource() = default;
+    SnapshotSource(const SnapshotSource&) = delete;
+    SnapshotSource& operator=(const SnapshotSource&) = delete;
+    virtual ~SnapshotSource() = default;
+
+    /// Whether something may have changed since the last read(). Never blocks;
+    /// costs one system call while nothing changes. True before the first read.
+    [[nodiscard]] virtual bool changed() = 0;
+
+    /// Reads the present state. Never throws and never returns null: what cannot
+    /// be read is logged and left out. Takes at most 250 ms.
+    [[nodiscard]] virtual std::shared_ptr<const Snapshot> read() = 0;
+};
+
+}  // namespace ZR

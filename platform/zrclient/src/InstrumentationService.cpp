@@ -1,0 +1,84 @@
+#include "zrclient/InstrumentationService.h"
+
+#include <utility>
+
+#include "sources/JsonTreeSource.h"
+#include "zrclient/LiveSource.h"
+#include "zrcommon/PlatformSettings.h"
+
+namespace ZR {
+
+namespace {
+
+std::unique_ptr<SnapshotSource> openSourceOfSettings() {
+    const std::string& tree = PlatformSettings::process().instrumentationTree;
+    if (!tree.empty()) {
+        return std::make_unique<JsonTreeSource>(tree);
+    }
+    return openLiveSource();
+}
+
+}  // namespace
+
+InstrumentationService& InstrumentationService::process() {
+    // Destroyed when the library is unloaded, and its descriptors with it.
+    static InstrumentationService service;
+    return service;
+}
+
+InstrumentationService::InstrumentationService(std::unique_ptr<SnapshotSource> source)
+    : source_(std::move(source)) {}
+
+std::shared_ptr<const Snapshot> InstrumentationService::published() {
+    const std::lock_guard lock(snapshotMutex_);
+    return snapshot_;
+}
+
+/// Reads the source and publishes what it read. Call with the source locked.
+std::shared_ptr<const Snapshot> InstrumentationService::readSource() {
+    if (!source_) {
+        source_ = openSourceOfSettings();
+    }
+    std::shared_ptr<const Snapshot> newest = source_->read();
+    ++readings_;
+    std::shared_ptr<const Snapshot> replaced = newest;
+    {
+        const std::lock_guard lock(snapshotMutex_);
+        snapshot_.swap(replaced);
+    }
+    // What was replaced ends here, outside the lock, if no cursor holds it.
+    return newest;
+}
+
+std::shared_ptr<const Snapshot> InstrumentationService::current() {
+    // Two requests never ask the source at once: the second one waits for a
+    // reading under way and then polls for itself, so that what it gets is at
+    // least as new as its call.
+    const std::lock_guard lock(sourceMutex_);
+    if (source_ && !source_->changed()) {
+        if (auto snapshot = published()) {
+            return snapshot;
+        }
+    }
+    return readSource();
+}
+
+std::shared_ptr<const Snapshot> InstrumentationService::latest() {
+    if (auto snapshot = published()) {
+        return snapshot;
+    }
+    const std::lock_guard lock(sourceMutex_);
+    // Another thread may have read while this one waited.
+    if (auto snapshot = published()) {
+        return snapshot;
+    }
+    return readSource();
+}
+
+void InstrumentationService::useSource(std::unique_ptr<SnapshotSource> source) {
+    // The replaced source is closed after the lock is let go.
+    const std::lock_guard lock(sourceMutex_);
+    source_.swap(source);
+}
+
+}  // namespace ZR

@@ -1,0 +1,33 @@
+#pragma once
+
+#include <memory>
+#include <string>
+
+#include "sources/FileWatch.h"
+#include "zrclient/Snapshot.h"
+#include "zrclient/SnapshotSource.h"
+
+namespace ZR {
+
+/// A JSON tree in a file as the source of snapshots. A file that cannot be used
+/// gives an empty snapshot and one line in the log, at level 6000; so does one
+/// that is read while its author is still writing it in place, until the next
+/// reading. Replacing the file by renaming another over it avoids that.
+class JsonTreeSource : public SnapshotSource {
+  public:
+    explicit JsonTreeSource(const std::string& path);
+
+    [[nodiscard]] bool changed() override;
+    [[nodiscard]] std::shared_ptr<const Snapshot> read() override;
+
+  private:
+    [[nodiscard]] std::shared_ptr<const Snapshot> tryToRead();
+    void complain(const std::string& message);
+
+    FileWatch watch_;
+    std::shared_ptr<const Snapshot> empty_;
+    std::string lastComplaint_;
+    bool readAgain_ = false;  // the next request is to try again, whatever the watch says
+};
+
+}  // namespace ZR

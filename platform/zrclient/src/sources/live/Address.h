@@ -1,0 +1,33 @@
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <optional>
+#include <span>
+#include <string>
+
+namespace ZR::Live {
+
+/// What the kernel tells about one address of a link.
+struct Address {
+    /// A lifetime without end.
+    static constexpr std::uint32_t infinite = UINT32_MAX;
+
+    std::uint32_t ifindex = 0;
+    std::uint8_t family = 0;                     ///< AF_INET or AF_INET6
+    std::string text;                            ///< the link's own address, never its peer's
+    std::uint32_t flags = 0;                     ///< IFA_F_*
+    std::uint8_t scope = 0;                      ///< RT_SCOPE_*
+    std::uint32_t validLifetime = infinite;      ///< seconds left when it was read
+    std::uint32_t preferredLifetime = infinite;  ///< seconds left when it was read
+    std::uint8_t protocol = 0;                   ///< IFAPROT_*; 0 when nobody says who set it
+
+    bool operator==(const Address&) const = default;
+};
+
+/// Facts of one RTM_NEWADDR message, header included. Any bytes give facts or
+/// nullopt: another or too short a message, an attribute whose length cannot be
+/// true, or no address of IPv4 or IPv6 in it.
+[[nodiscard]] std::optional<Address> parseAddress(std::span<const std::byte> message);
+
+}  // namespace ZR::Live

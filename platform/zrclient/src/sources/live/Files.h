@@ -1,0 +1,26 @@
+#pragma once
+
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace ZR::Live {
+
+/// The content of a file that need not exist. That it cannot be read although it
+/// exists is another thing, and goes to the complaints.
+[[nodiscard]] std::optional<std::string> readOptionalFile(const std::string& path,
+                                                          std::vector<std::string>& complaints);
+
+/// The names in a directory that need not exist, sorted, without those that begin
+/// with a point: such are half-written files waiting to be renamed.
+[[nodiscard]] std::vector<std::string> listOptionalDirectory(const std::string& path,
+                                                             std::vector<std::string>& complaints);
+
+/// DIRECTORY/NAME
+[[nodiscard]] std::string pathIn(const std::string& directory, std::string_view name);
+
+/// "cannot read PATH: REASON"
+[[nodiscard]] std::string unreadable(std::string_view path, int error);
+
+}  // namespace ZR::Live

@@ -1,0 +1,55 @@
+#pragma once
+
+#include <chrono>
+#include <cstdint>
+#include <functional>
+#include <memory>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "ChangeMonitor.h"
+#include "NetlinkTransport.h"
+#include "Roots.h"
+#include "RtnetlinkReader.h"
+#include "zrclient/SnapshotSource.h"
+
+namespace ZR::Live {
+
+/// What a live machine is read from.
+struct Surroundings {
+    Roots roots;
+    std::unique_ptr<NetlinkTransport> transport = kernelTransport();
+    /// Seconds since the epoch.
+    std::function<std::int64_t()> now = [] {
+        return static_cast<std::int64_t>(
+            std::chrono::system_clock::to_time_t(std::chrono::system_clock::now()));
+    };
+    /// False when the process file system is one that was laid out: its numbers
+    /// then are those of other processes.
+    bool realProcesses = true;
+    /// Takes what could not be read, or not for certain.
+    std::function<void(std::string_view)> complain;
+};
+
+/// The machine as its kernel and its DHCP clients show it now.
+class LiveMachine final : public SnapshotSource {
+  public:
+    explicit LiveMachine(Surroundings surroundings);
+
+    [[nodiscard]] bool changed() override;
+    [[nodiscard]] std::shared_ptr<const Snapshot> read() override;
+
+  private:
+    [[nodiscard]] ClientFacts readClients(std::vector<std::string>& complaints);
+    void watchProcesses(const std::vector<ClientProcess>& processes);
+    void report(std::vector<std::string> complaints);
+
+    Surroundings surroundings_;
+    RtnetlinkReader reader_;
+    ChangeMonitor monitor_;
+    std::vector<WatchedPlace> places_;
+    std::vector<std::string> reported_;
+};
+
+}  // namespace ZR::Live

@@ -1,0 +1,13 @@
+#pragma once
+
+#include "Lease.h"
+#include "Roots.h"
+
+namespace ZR::Live {
+
+/// Adds the running DHCP clients. Those of another network namespace concern
+/// other links, possibly of the same names; those whose namespace cannot be told
+/// are not trusted. Of any other process nothing but its name is read.
+void readProcesses(const Roots& roots, ClientFacts& facts);
+
+}  // namespace ZR::Live

@@ -1,0 +1,100 @@
+#include "zrclient/SnapshotJson.h"
+
+#include "Support.h"
+#include "sources/JsonTreeSource.h"
+
+namespace ZR::Testing {
+namespace {
+
+using NodeLexicon::Properties;
+
+std::shared_ptr<const Snapshot> everyKind() {
+    SnapshotBuilder builder;
+    const auto computer = builder.add(Snapshot::none, "ComputerSystem", "Computer \"A\"\n\\");
+    builder.property(Properties::Name, std::string("host/1%"), true);
+    const auto network = builder.add(computer, "Network", "Network");
+    builder.add(network, "NetworkInterface", "Ethernet interface");
+    builder.property(Properties::IPv4Address, std::string("192.0.2.17"));
+    builder.property(Properties::Name, std::string("\xc3\xa4th0"), true);
+    builder.property(Properties::NameMaxLength, std::uint64_t{UINT64_MAX});
+    builder.property(Properties::DHCPEnabled, false);
+    builder.property(Properties::AddressSource, PropertyValue(), true);
+    builder.property(Properties::DHCPServerAddresses, std::vector<std::string>{"192.0.2.1", ""});
+    const auto twin = builder.add(network, "NetworkInterface", "twin");
+    builder.add(twin, "NetworkInterface", "below");
+    builder.property(Properties::DHCPServerAddresses, std::vector<std::string>{});
+    builder.add(network, "NetworkInterface", "twin");
+    builder.add(Snapshot::none, "ComputerSystem", "");
+    return builder.build();
+}
+
+TEST(SnapshotJson, WritesWhatIsReadBackAsEqual) {
+    const auto snapshot = everyKind();
+    EXPECT_TRUE(*parsed(toJson(*snapshot)) == *snapshot) << toJson(*snapshot);
+}
+
+TEST(SnapshotJson, WritesAFileThatTheSourceReadsBackAsEqual) {
+    const Directory directory;
+    const auto snapshot = everyKind();
+    writeInPlace(directory / "tree.json", toJson(*snapshot));
+    EXPECT_TRUE(*JsonTreeSource(directory / "tree.json").read() == *snapshot);
+}
+
+TEST(SnapshotJson, DifferentTreesAreNotEqual) {
+    const auto snapshot = everyKind();
+    std::string other = toJson(*snapshot);
+    other.replace(other.find("192.0.2.17"), 10, "192.0.2.18");
+    EXPECT_FALSE(*parsed(other) == *snapshot);
+}
+
+TEST(SnapshotJson, IsIndentedByTwo) {
+    SnapshotBuilder builder;
+    const auto computer = builder.add(Snapshot::none, "ComputerSystem", "Computer");
+    builder.property(Properties::Name, std::string("host"), true);
+    builder.add(computer, "Network", "Network");
+    EXPECT_EQ(toJson(*builder.build()), R"({
+  "nodes": [
+    {
+      "type": "ComputerSystem",
+      "description": "Computer",
+      "properties": {
+        "Name": "host"
+      },
+      "readOnly": [
+        "Name"
+      ],
+      "children": [
+        {
+          "type": "Network",
+          "description": "Network"
+        }
+      ]
+    }
+  ]
+}
+)");
+}
+
+TEST(SnapshotJson, AnEmptyTreeHasNoNodes) {
+    EXPECT_EQ(toJson(*SnapshotBuilder().build()), "{\n  \"nodes\": []\n}\n");
+}
+
+TEST(SnapshotJson, StaysJsonWithBytesThatAreNoText) {
+    SnapshotBuilder builder;
+    builder.add(Snapshot::none, "T", "\xff\xfe");
+    EXPECT_EQ(parsed(toJson(*builder.build()))->node(0).description, "\xef\xbf\xbd\xef\xbf\xbd");
+}
+
+TEST(SnapshotJson, TenThousandInterfacesComeBackEqual) {
+    SnapshotBuilder builder;
+    const auto computer = builder.add(Snapshot::none, "ComputerSystem", "Computer");
+    for (unsigned number = 0; number < 10'000; ++number) {
+        builder.add(computer, "NetworkInterface", "Ethernet interface");
+        builder.property(Properties::Name, "eth" + std::to_string(number));
+    }
+    const auto snapshot = builder.build();
+    EXPECT_TRUE(*parsed(toJson(*snapshot)) == *snapshot);
+}
+
+}  // namespace
+}  // namespace ZR::Testing

@@ -1,0 +1,214 @@
+// Files laid out in a directory, and prepared answers in place of the kernel's: the
+// whole way from bytes to nodes, for states that no test machine can be put into.
+// KernelTest.cpp and DhcpLifeTest.cpp go the same way with a real kernel and clients.
+
+#include "LiveMachine.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <linux/if_addr.h>
+
+#include <memory>
+
+#include "ScriptedTransport.h"
+#include "Support.h"
+#include "zrclient/LiveSource.h"
+#include "zrcommon/SystemName.h"
+
+namespace ZR::Live {
+namespace {
+
+using NodeLexicon::Properties;
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::IsEmpty;
+
+using Servers = std::vector<std::string>;
+
+class LiveMachineTest : public testing::Test {
+  protected:
+    static std::vector<Step> links(int count) {
+        std::vector<Message> messages;
+        for (int i = 1; i <= count; ++i) {
+            Message message = linkMessage(i + 1, "eth" + std::to_string(i), 0x11043);
+            message.number(IFLA_OPERSTATE, std::uint8_t{6});
+            messages.push_back(message);
+        }
+        messages.emplace_back(NLMSG_DONE, std::uint16_t{NLM_F_MULTI}, std::int32_t{0});
+        return {Step{messages}};
+    }
+    static std::vector<Step> address(unsigned ifindex, std::array<std::uint8_t, 4> bytes) {
+        return {Step{
+            {addressMessage(ifindex, bytes), Message{NLMSG_DONE, NLM_F_MULTI, std::int32_t{0}}}}};
+    }
+    static std::vector<Step> refused(int error) {
+        nlmsgerr answer{};
+        answer.error = -error;
+        return {Step{{Message{NLMSG_ERROR, 0, answer}}}};
+    }
+
+    LiveMachine& open(std::deque<std::vector<Step>> answers) {
+        Surroundings surroundings;
+        std::filesystem::create_directories(root_.path("/proc/thread-self/ns"));
+        surroundings.roots = {.files = root_.path(), .proc = root_.path("/proc")};
+        surroundings.transport = std::make_unique<ScriptedTransport>(std::move(answers));
+        surroundings.realProcesses = false;
+        surroundings.now = [this] { return now_; };
+        surroundings.complain = [this](std::string_view text) { complaints_.emplace_back(text); };
+        machine_ = std::make_unique<LiveMachine>(std::move(surroundings));
+        return *machine_;
+    }
+
+    TemporaryDirectory root_;
+    std::int64_t now_ = 1'795'216'200;
+    std::vector<std::string> complaints_;
+    std::unique_ptr<LiveMachine> machine_;
+};
+
+TEST_F(LiveMachineTest, CapturedNetworkdLeaseOnItsLink) {
+    root_.write("/run/systemd/netif/links/2", sample("networkd/run-systemd-netif-links-2.txt"));
+    root_.write("/run/systemd/netif/leases/2", sample("networkd/run-systemd-netif-leases-2.txt"));
+    root_.write("/etc/systemd/network/10-eth1.network", sample("networkd/10-eth1.network"));
+    const auto tree = open({links(1), address(2, {198, 51, 100, 110})}).read();
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPEnabled), PropertyValue{true});
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::AddressSource), number(1));
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{"198.51.100.1"}});
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::IPv4Address), PropertyValue{"198.51.100.110"});
+    EXPECT_THAT(complaints_, IsEmpty());
+}
+
+TEST_F(LiveMachineTest, CapturedDhclientLeaseLivesUntilItsEnd) {
+    root_.write("/var/lib/dhcp/dhclient.eth1.leases", sample("isc-dhclient/dhclient.eth1.leases"));
+    LiveMachine& machine = open(
+        {links(1), address(2, {198, 51, 100, 106}), links(1), address(2, {198, 51, 100, 106})});
+    EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{"198.51.100.1"}});
+    now_ = 1'795'216'781;
+    EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{}});
+}
+
+TEST_F(LiveMachineTest, CapturedReleaseLeavesTheOtherInterfaceItsServer) {
+    root_.write("/var/lib/dhcp/dhclient.leases",
+                sample("isc-dhclient/dhclient.leases.two-interfaces-then-release-eth1"));
+    const std::vector<Step> both{
+        Step{{addressMessage(3, {198, 51, 100, 122}), addressMessage(2, {198, 51, 100, 106}),
+              Message{NLMSG_DONE, NLM_F_MULTI, std::int32_t{0}}}}};
+    now_ = 1'795'216'234;
+    const auto tree = open({links(2), both}).read();
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPServerAddresses), PropertyValue{Servers{}});
+    EXPECT_EQ(valueOf(*tree, "eth2", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{"198.51.100.1"}});
+}
+
+TEST_F(LiveMachineTest, TheComputerHasTheHostsName) {
+    const auto tree = open({links(1), address(2, {192, 0, 2, 1})}).read();
+    const auto* const name = tree->find(0, Properties::Name);
+    ASSERT_NE(name, nullptr);
+    EXPECT_EQ(name->value, PropertyValue{getSystemName()});
+}
+
+TEST_F(LiveMachineTest, UnreadableLinksGiveNoInterfacesAndOneLine) {
+    LiveMachine& machine = open({links(1), address(2, {192, 0, 2, 1}), refused(EPERM),
+                                 refused(EPERM), links(1), address(2, {192, 0, 2, 1})});
+    EXPECT_THAT(interfaceNames(*machine.read()), ElementsAre("eth1"));
+    EXPECT_THAT(interfaceNames(*machine.read()), IsEmpty());
+    EXPECT_THAT(complaints_, ElementsAre("network links: refused: Operation not permitted"));
+    EXPECT_TRUE(machine.changed()) << "to be read again";
+    EXPECT_THAT(interfaceNames(*machine.read()), IsEmpty());
+    EXPECT_EQ(complaints_.size(), 1U) << "a lasting trouble is told once";
+    EXPECT_THAT(interfaceNames(*machine.read()), ElementsAre("eth1"));
+    EXPECT_FALSE(machine.changed());
+}
+
+TEST_F(LiveMachineTest, ATroubleThatReturnsIsToldAgain) {
+    LiveMachine& machine =
+        open({refused(EPERM), links(1), address(2, {192, 0, 2, 1}), refused(EPERM)});
+    for (int i = 0; i < 3; ++i) {
+        static_cast<void>(machine.read());
+    }
+    EXPECT_EQ(complaints_.size(), 2U);
+}
+
+TEST_F(LiveMachineTest, AKernelThatDoesNotAnswerHoldsNobodyUp) {
+    LiveMachine& machine = open({});
+    const auto start = std::chrono::steady_clock::now();
+    EXPECT_THAT(interfaceNames(*machine.read()), IsEmpty());
+    const auto took = std::chrono::steady_clock::now() - start;
+    EXPECT_LT(took, std::chrono::milliseconds{250});
+    EXPECT_THAT(complaints_, ElementsAre(HasSubstr("no answer: ")));
+}
+
+TEST_F(LiveMachineTest, InterruptedReadingsAreShownAndReadAgain) {
+    const std::vector<Step> interrupted{
+        Step{{linkMessage(2, "eth1", 0x11043, NLM_F_MULTI | NLM_F_DUMP_INTR),
+              Message{NLMSG_DONE, NLM_F_MULTI, std::int32_t{0}}}}};
+    LiveMachine& machine =
+        open({interrupted, interrupted, interrupted, address(2, {192, 0, 2, 1})});
+    EXPECT_THAT(interfaceNames(*machine.read()), ElementsAre("eth1"));
+    EXPECT_TRUE(machine.changed());
+}
+
+TEST_F(LiveMachineTest, BeforeItIsReadItCountsAsChanged) {
+    EXPECT_TRUE(open({}).changed());
+}
+
+TEST_F(LiveMachineTest, EveryPlaceThatItReadsIsWatched) {
+    root_.write("/proc/17/comm", "dhclient\n");
+    root_.write("/proc/17/cmdline", std::string{"dhclient\0-lf\0/srv/own.leases\0eth1\0", 34});
+    for (const char* process : {"17", "thread-self"}) {
+        std::filesystem::create_directories(root_.path("/proc/") + process + "/ns");
+        std::filesystem::create_symlink("net:[1]", root_.path("/proc/") + process + "/ns/net");
+    }
+    root_.write("/run/systemd/netif/links/2",
+                "ADMIN_STATE=configured\nNETWORK_FILE=/etc/systemd/network/a.network\n");
+    std::deque<std::vector<Step>> answers;
+    for (int i = 0; i < 20; ++i) {
+        answers.push_back(links(1));
+        answers.push_back(address(2, {192, 0, 2, 1}));
+    }
+    LiveMachine& machine = open(std::move(answers));
+    static_cast<void>(machine.read());
+    EXPECT_FALSE(machine.changed());
+    for (const char* file :
+         {"/run/systemd/netif/leases/2", "/run/systemd/netif/links/3", "/srv/own.leases",
+          "/var/lib/dhcp/dhclient.leases", "/var/lib/dhclient/dhclient--eth0.lease",
+          "/var/lib/NetworkManager/dhclient-1-eth1.lease", "/etc/systemd/network/a.network",
+          "/run/systemd/network/a.network.d/a.conf"}) {
+        root_.write(file, "x");
+        EXPECT_TRUE(machine.changed()) << file;
+        static_cast<void>(machine.read());
+        EXPECT_FALSE(machine.changed()) << file;
+        root_.append(file, "y");
+        EXPECT_TRUE(machine.changed()) << file;
+        static_cast<void>(machine.read());
+        EXPECT_FALSE(machine.changed()) << file;
+    }
+}
+
+TEST_F(LiveMachineTest, WirelessDevicesAreDescribedAsSuch) {
+    Message device = linkMessage(2, "wlan0", 0x11043);
+    device.text(56, "0000:00:03.0");
+    Message other = linkMessage(3, "eth0", 0x11043);
+    other.text(56, "0000:00:04.0");
+    std::filesystem::create_directories(root_.path("/sys/class/net/wlan0/phy80211"));
+    const auto tree =
+        open({{Step{{device, other, Message{NLMSG_DONE, NLM_F_MULTI, std::int32_t{0}}}}},
+              address(2, {192, 0, 2, 1})})
+            .read();
+    EXPECT_EQ(tree->node(interfaceNode(*tree, "wlan0")).description, "Wireless interface");
+    EXPECT_EQ(tree->node(interfaceNode(*tree, "eth0")).description, "Ethernet interface");
+}
+
+TEST(LiveSource, ReadsThisMachine) {
+    const auto source = openLiveSource();
+    ASSERT_NE(source, nullptr);
+    EXPECT_TRUE(source->changed());
+    const auto tree = source->read();
+    ASSERT_NE(tree, nullptr);
+    EXPECT_EQ(tree->node(0).type, "ComputerSystem");
+}
+
+}  // namespace
+}  // namespace ZR::Live
