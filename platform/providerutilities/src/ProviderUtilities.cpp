@@ -1,0 +1,334 @@
+#include "providerutilities/ProviderUtilities.h"
+
+namespace ZR {
+
+namespace {
+
+/// The broker with which this thread last made a path or an instance.
+thread_local const CMPIBroker* lastBroker = nullptr;
+
+std::string_view textOf(const CMPIString* string) {
+    if (string == nullptr || string->ft == nullptr) {
+        return {};
+    }
+    const char* text = string->ft->getCharPtr(string, nullptr);
+    return text == nullptr ? std::string_view{} : std::string_view(text);
+}
+
+CMPIString* makeString(const CMPIBroker* broker, const std::string& text) {
+    if (broker == nullptr) {
+        return nullptr;
+    }
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    CMPIString* string = broker->eft->newString(broker, text.c_str(), &status);
+    return status.rc == CMPI_RC_OK ? string : nullptr;
+}
+
+bool isOk(const CMPIStatus& status) {
+    return status.rc == CMPI_RC_OK;
+}
+
+bool holdsValue(const CMPIData& data) {
+    constexpr unsigned int unusable = CMPI_nullValue | CMPI_notFound | CMPI_badValue;
+    return (data.state & unusable) == 0U;
+}
+
+/// Takes a text out of data of either text type.
+bool readText(const CMPIData& data, std::string& value) {
+    if (!holdsValue(data)) {
+        return false;
+    }
+    if (data.type == CMPI_string && data.value.string != nullptr) {
+        value = textOf(data.value.string);
+        return true;
+    }
+    if (data.type == CMPI_chars && data.value.chars != nullptr) {
+        value = data.value.chars;
+        return true;
+    }
+    return false;
+}
+
+bool put(CMPIInstance* instance, const char* name, const CMPIValue& value, CMPIType type) {
+    return instance != nullptr && name != nullptr &&
+           isOk(instance->ft->setProperty(instance, name, &value, type));
+}
+
+bool put(CMPIObjectPath* path, const char* name, const CMPIValue& value, CMPIType type) {
+    return path != nullptr && name != nullptr && isOk(path->ft->addKey(path, name, &value, type));
+}
+
+/// Sets a text as the value of a property or a key, whichever `holder` has.
+template <typename Holder>
+bool putText(const CMPIBroker* broker, Holder* holder, const char* name, const std::string& text) {
+    if (holder == nullptr || name == nullptr) {
+        return false;
+    }
+    CMPIValue value{};
+    value.string = makeString(broker, text);
+    return value.string != nullptr && put(holder, name, value, CMPI_string);
+}
+
+/// Sets an array property whose elements `fill(index, value)` provides.
+template <typename Fill>
+bool putArray(const CMPIBroker* broker, CMPIInstance* instance, const char* name, std::size_t size,
+              CMPIType elementType, Fill fill) {
+    if (broker == nullptr || instance == nullptr || name == nullptr) {
+        return false;
+    }
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    CMPIValue value{};
+    value.array = broker->eft->newArray(broker, static_cast<CMPICount>(size), elementType, &status);
+    if (value.array == nullptr || !isOk(status)) {
+        return false;
+    }
+    for (std::size_t i = 0; i < size; ++i) {
+        CMPIValue element{};
+        if (!fill(i, element) ||
+            !isOk(value.array->ft->setElementAt(value.array, static_cast<CMPICount>(i), &element,
+                                                elementType))) {
+            return false;
+        }
+    }
+    return put(instance, name, value, static_cast<CMPIType>(CMPI_ARRAY | elementType));
+}
+
+bool classIsA(const CMPIBroker* broker, const std::string& nameSpace, const char* className,
+              const char* ancestor) {
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    const CMPIObjectPath* path =
+        broker->eft->newObjectPath(broker, nameSpace.c_str(), className, &status);
+    if (path == nullptr || !isOk(status)) {
+        return false;
+    }
+    return broker->eft->classPathIsA(broker, path, ancestor, &status) != 0 && isOk(status);
+}
+
+}  // namespace
+
+unsigned short ProviderUtilities::getClassId(const CMPIObjectPath* path) {
+    if (path == nullptr) {
+        return unknownClass;
+    }
+    const CMPIString* name = path->ft->getClassName(path, nullptr);
+    return getClassId(name == nullptr ? nullptr : textOf(name).data());
+}
+
+bool ProviderUtilities::areClassesRelated(const CMPIBroker* broker, const std::string& nameSpace,
+                                          const char* className, const char* parent) {
+    if (className == nullptr || *className == '\0') {
+        return true;
+    }
+    if (broker == nullptr || parent == nullptr) {
+        return false;
+    }
+    return classIsA(broker, nameSpace, className, parent) ||
+           classIsA(broker, nameSpace, parent, className);
+}
+
+std::string ProviderUtilities::getNamespace(const CMPIObjectPath* path) {
+    if (path == nullptr) {
+        return {};
+    }
+    return std::string(textOf(path->ft->getNameSpace(path, nullptr)));
+}
+
+CMPIObjectPath* ProviderUtilities::createObjectPath(const CMPIBroker* broker, const char* className,
+                                                    const std::string& nameSpace) {
+    if (broker == nullptr || className == nullptr) {
+        return nullptr;
+    }
+    lastBroker = broker;
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    CMPIObjectPath* path =
+        broker->eft->newObjectPath(broker, nameSpace.c_str(), className, &status);
+    return isOk(status) ? path : nullptr;
+}
+
+CMPIInstance* ProviderUtilities::createInstance(const CMPIBroker* broker,
+                                                const CMPIObjectPath* path) {
+    if (broker == nullptr || path == nullptr) {
+        return nullptr;
+    }
+    lastBroker = broker;
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    CMPIInstance* instance = broker->eft->newInstance(broker, path, &status);
+    return isOk(status) ? instance : nullptr;
+}
+
+unsigned int ProviderUtilities::getKeyCount(const CMPIObjectPath* path) {
+    return path == nullptr ? 0 : path->ft->getKeyCount(path, nullptr);
+}
+
+bool ProviderUtilities::getKeyProperty(const CMPIObjectPath* path, const char* name,
+                                       std::string& value) {
+    if (path == nullptr || name == nullptr) {
+        return false;
+    }
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    const CMPIData data = path->ft->getKey(path, name, &status);
+    return isOk(status) && readText(data, value);
+}
+
+bool ProviderUtilities::getKeyProperty(const CMPIObjectPath* path, const char* name,
+                                       CMPIObjectPath** reference) {
+    if (path == nullptr || name == nullptr || reference == nullptr) {
+        return false;
+    }
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    const CMPIData data = path->ft->getKey(path, name, &status);
+    if (!isOk(status) || !holdsValue(data) || data.type != CMPI_ref || data.value.ref == nullptr) {
+        return false;
+    }
+    *reference = data.value.ref;
+    return true;
+}
+
+bool ProviderUtilities::setKeyProperty(CMPIObjectPath* path, const char* name,
+                                       const std::string& value) {
+    return putText(lastBroker, path, name, value);
+}
+
+bool ProviderUtilities::setKeyProperty(CMPIObjectPath* path, const char* name,
+                                       CMPIObjectPath* reference) {
+    CMPIValue value{};
+    value.ref = reference;
+    return reference != nullptr && put(path, name, value, CMPI_ref);
+}
+
+bool ProviderUtilities::setProperty(CMPIInstance* instance, const char* name,
+                                    const std::string& value) {
+    return putText(lastBroker, instance, name, value);
+}
+
+bool ProviderUtilities::setProperty(CMPIInstance* instance, const char* name,
+                                    unsigned short number) {
+    CMPIValue value{};
+    value.uint16 = number;
+    return put(instance, name, value, CMPI_uint16);
+}
+
+bool ProviderUtilities::setProperty(CMPIInstance* instance, const char* name, unsigned int number) {
+    CMPIValue value{};
+    value.uint32 = number;
+    return put(instance, name, value, CMPI_uint32);
+}
+
+bool ProviderUtilities::setProperty(CMPIInstance* instance, const char* name,
+                                    unsigned long long number) {
+    CMPIValue value{};
+    value.uint64 = number;
+    return put(instance, name, value, CMPI_uint64);
+}
+
+bool ProviderUtilities::setProperty(CMPIInstance* instance, const char* name, bool truth) {
+    CMPIValue value{};
+    value.boolean = truth ? 1 : 0;
+    return put(instance, name, value, CMPI_boolean);
+}
+
+bool ProviderUtilities::setProperty(CMPIInstance* instance, const char* name,
+                                    CMPIObjectPath* reference) {
+    CMPIValue value{};
+    value.ref = reference;
+    return reference != nullptr && put(instance, name, value, CMPI_ref);
+}
+
+bool ProviderUtilities::setProperty(const CMPIBroker* broker, CMPIInstance* instance,
+                                    const char* name, const std::string& text, bool dateTime) {
+    if (broker == nullptr || instance == nullptr || name == nullptr) {
+        return false;
+    }
+    if (!dateTime) {
+        return putText(broker, instance, name, text);
+    }
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    CMPIValue value{};
+    value.dateTime = broker->eft->newDateTimeFromChars(broker, text.c_str(), &status);
+    return value.dateTime != nullptr && isOk(status) && put(instance, name, value, CMPI_dateTime);
+}
+
+bool ProviderUtilities::setProperty(const CMPIBroker* broker, CMPIInstance* instance,
+                                    const char* name, const std::vector<unsigned short>& values) {
+    return putArray(broker, instance, name, values.size(), CMPI_uint16,
+                    [&values](std::size_t i, CMPIValue& element) {
+                        element.uint16 = values[i];
+                        return true;
+                    });
+}
+
+bool ProviderUtilities::setProperty(const CMPIBroker* broker, CMPIInstance* instance,
+                                    const char* name, const std::vector<std::string>& values) {
+    return putArray(broker, instance, name, values.size(), CMPI_string,
+                    [broker, &values](std::size_t i, CMPIValue& element) {
+                        element.string = makeString(broker, values[i]);
+                        return element.string != nullptr;
+                    });
+}
+
+bool ProviderUtilities::getProperty(const CMPIInstance* instance, const char* name,
+                                    std::string& value, bool dateTime) {
+    if (instance == nullptr || name == nullptr) {
+        return false;
+    }
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    const CMPIData data = instance->ft->getProperty(instance, name, &status);
+    if (!isOk(status) || !holdsValue(data)) {
+        return false;
+    }
+    if (!dateTime) {
+        return readText(data, value);
+    }
+    if (data.type != CMPI_dateTime || data.value.dateTime == nullptr) {
+        return false;
+    }
+    const CMPIString* text = data.value.dateTime->ft->getStringFormat(data.value.dateTime, &status);
+    if (text == nullptr || !isOk(status)) {
+        return false;
+    }
+    value = textOf(text);
+    return true;
+}
+
+bool ProviderUtilities::transformObjectPathToMoniker(const CMPIObjectPath* path, Moniker& moniker) {
+    if (path == nullptr) {
+        return false;
+    }
+    const unsigned int count = getKeyCount(path);
+    for (unsigned int i = 0; i < count; ++i) {
+        CMPIStatus status{CMPI_RC_OK, nullptr};
+        CMPIString* name = nullptr;
+        const CMPIData data = path->ft->getKeyAt(path, i, &name, &status);
+        std::string value;
+        if (isOk(status) && name != nullptr && readText(data, value)) {
+            moniker.addKey(std::string(textOf(name)), value);
+        }
+    }
+    return true;
+}
+
+bool ProviderUtilities::transformMonikerToObjectPath(Moniker& moniker, CMPIObjectPath** path) {
+    if (path == nullptr || *path == nullptr) {
+        return false;
+    }
+    const CMPIString* className = (*path)->ft->getClassName(*path, nullptr);
+    CMPIObjectPath* transformed =
+        className == nullptr ? nullptr
+                             : createObjectPath(lastBroker, std::string(textOf(className)).c_str(),
+                                                getNamespace(*path));
+    if (transformed == nullptr) {
+        return false;
+    }
+    for (std::size_t i = 0; i < moniker.getKeyCount(); ++i) {
+        std::string name;
+        std::string value;
+        if (!moniker.selectKey(i) || !moniker.getName(name) || !moniker.getValue(value) ||
+            !setKeyProperty(transformed, name.c_str(), value)) {
+            return false;
+        }
+    }
+    *path = transformed;
+    return true;
+}
+
+}  // namespace ZR
