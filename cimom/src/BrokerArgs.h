@@ -1,0 +1,24 @@
+#pragma once
+
+#include <cmpift.h>
+
+#include "Arena.h"
+#include "BrokerValues.h"
+
+namespace cimom::broker {
+
+/// A CMPIArgs: named method arguments.
+struct ArgsRecord : CMPIArgs {
+    Arena* arena;
+    EntryList entries;
+};
+
+extern const CMPIArgsFT argsTable;
+
+/// Null unless the arguments were made by this broker and are alive.
+[[nodiscard]] ArgsRecord* argsOf(const CMPIArgs* args) noexcept;
+
+/// Throws std::bad_alloc.
+ArgsRecord* makeArgs(Arena& arena);
+
+}  // namespace cimom::broker

@@ -1,0 +1,41 @@
+#pragma once
+
+#include <cmpift.h>
+
+#include <atomic>
+
+#include "Arena.h"
+#include "BrokerObjectPath.h"
+#include "BrokerValues.h"
+#include "Schema.h"
+
+namespace cimom::broker {
+
+/// Which properties an instance keeps.
+struct PropertyFilter {
+    bool active = false;
+    CMPICount size = 0;
+    StringRecord** names = nullptr;
+};
+
+/// A CMPIInstance.
+struct InstanceRecord : CMPIInstance {
+    Arena* arena;
+    PathRecord* path;
+    const ClassIndex* declaration;  ///< null: its class is unknown, nothing is checked
+    EntryList properties;
+    PropertyFilter filter;
+    /// The copy of the path last handed out; handed out again while neither has changed.
+    std::atomic<PathRecord*>* handedOut;
+};
+
+extern const CMPIInstanceFT instanceTable;
+
+/// Null unless the instance was made by this broker and is alive.
+[[nodiscard]] InstanceRecord* instanceOf(const CMPIInstance* instance) noexcept;
+
+/// An instance without properties; the path is copied. Throw std::bad_alloc.
+InstanceRecord* makeInstance(Arena& arena, const PathRecord& path);
+InstanceRecord* copyInstance(Arena& arena, const InstanceRecord& instance);
+
+}  // namespace cimom::broker

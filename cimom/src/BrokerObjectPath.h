@@ -1,0 +1,33 @@
+#pragma once
+
+#include <cmpift.h>
+
+#include "Arena.h"
+#include "BrokerString.h"
+#include "BrokerValues.h"
+#include "Schema.h"
+
+namespace cimom::broker {
+
+/// A CMPIObjectPath. Components that are not set are empty texts.
+struct PathRecord : CMPIObjectPath {
+    Arena* arena;
+    const Schema* schema;  ///< null: no class is known
+    StringRecord* host;
+    StringRecord* nameSpace;
+    StringRecord* className;
+    EntryList keys;
+    unsigned changes;  ///< how often a setter was used since it was made
+};
+
+extern const CMPIObjectPathFT objectPathTable;
+
+/// Null unless the path was made by this broker and is alive.
+[[nodiscard]] PathRecord* pathOf(const CMPIObjectPath* path) noexcept;
+
+/// Throw std::bad_alloc.
+PathRecord* makePath(Arena& arena, const Schema* schema, std::string_view nameSpace,
+                     std::string_view className);
+PathRecord* copyPath(Arena& arena, const PathRecord& path);
+
+}  // namespace cimom::broker

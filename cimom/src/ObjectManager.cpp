@@ -1,0 +1,178 @@
+#include "cimom/ObjectManager.h"
+
+#include <unistd.h>
+
+#include <algorithm>
+#include <array>
+
+#include "ObjectManagerImplementation.h"
+#include "RequestPath.h"
+
+namespace cimom {
+
+namespace {
+
+std::string machineName() {
+    std::array<char, 256> name{};
+    // A machine without a readable name still needs one in its answers.
+    if (gethostname(name.data(), name.size() - 1) != 0 || name.front() == '\0') {
+        return "localhost";
+    }
+    return name.data();
+}
+
+}  // namespace
+
+bool ServedClass::isIn(std::string_view nameSpace) const noexcept {
+    return std::any_of(nameSpaces.begin(), nameSpaces.end(),
+                       [nameSpace](const std::string& one) { return sameName(one, nameSpace); });
+}
+
+ObjectManager::Implementation::Implementation(ObjectManager& manager, Configuration configuration)
+    : configuration_(std::move(configuration)) {
+    if (configuration_.host.empty()) {
+        configuration_.host = machineName();
+    }
+    for (const auto& directory : configuration_.schemaDirectories) {
+        repository_.loadDirectory(directory);
+    }
+    repository_.complete();
+    for (const auto& file : configuration_.registrationFiles) {
+        auto read = readRegistrations(file);
+        std::move(read.begin(), read.end(), std::back_inserter(registrations_));
+    }
+    schema_.emplace(repository_);
+    providers_.emplace(configuration_.providerDirectories, *schema_, &manager);
+    served_.reserve(registrations_.size());
+    for (const Registration& registration : registrations_) {
+        serve(registration);
+    }
+}
+
+void ObjectManager::Implementation::serve(const Registration& registration) {
+    const std::string who =
+        "class " + registration.className + " of provider " + registration.provider;
+    const ClassDeclaration* const declaration = repository_.find(registration.className);
+    if (declaration == nullptr) {
+        throw LoadError(who + " is in none of the schema's files");
+    }
+    ServedClass served{declaration,
+                       &providers_->provider(registration.location, registration.provider),
+                       registration.instance,
+                       registration.association,
+                       {}};
+    for (const std::string& nameSpace : registration.nameSpaces) {
+        const auto known = std::find_if(nameSpaces_.begin(), nameSpaces_.end(),
+                                        [&](const auto& one) { return sameName(one, nameSpace); });
+        if (known == nameSpaces_.end()) {
+            nameSpaces_.push_back(nameSpace);
+        }
+        for (const std::size_t index : servedByName_[declaration->name]) {
+            const ServedClass& other = served_[index];
+            if (other.isIn(nameSpace) && ((other.instance && served.instance) ||
+                                          (other.association && served.association))) {
+                throw LoadError(who + " is registered twice for namespace " + nameSpace);
+            }
+        }
+        served.nameSpaces.push_back(nameSpace);
+    }
+    served_.push_back(std::move(served));
+    servedByName_[declaration->name].push_back(served_.size() - 1);
+}
+
+Status ObjectManager::Implementation::canonical(ObjectPath& path) const {
+    return canonicalize(path, repository_, nameSpaces_);
+}
+
+const std::string& ObjectManager::Implementation::canonicalClass(
+    const std::string& className) const {
+    const ClassDeclaration* const declaration = repository_.find(className);
+    return declaration == nullptr ? className : declaration->name;
+}
+
+template <typename Serves>
+ObjectManager::Implementation::ServedClasses ObjectManager::Implementation::served(
+    const std::string& className, const std::string& nameSpace, Serves&& serves) const {
+    ServedClasses found;
+    for (const ClassDeclaration* const declaration : repository_.withSubclasses(className)) {
+        const auto entry = servedByName_.find(declaration->name);
+        if (entry == servedByName_.end()) {
+            continue;
+        }
+        for (const std::size_t index : entry->second) {
+            if (serves(served_[index]) && served_[index].isIn(nameSpace)) {
+                found.push_back(&served_[index]);
+            }
+        }
+    }
+    return found;
+}
+
+ObjectManager::Implementation::ServedClasses ObjectManager::Implementation::servedInstances(
+    const std::string& className, const std::string& nameSpace) const {
+    return served(className, nameSpace, [](const ServedClass& one) { return one.instance; });
+}
+
+ObjectManager::Implementation::ServedClasses ObjectManager::Implementation::servedAssociations(
+    const std::string& className, const std::string& nameSpace) const {
+    return served(className, nameSpace, [](const ServedClass& one) { return one.association; });
+}
+
+CallSettings ObjectManager::Implementation::settings(const std::string& principal,
+                                                     CMPIFlags flags) const {
+    return {&*schema_, principal, flags};
+}
+
+ObjectManager::ObjectManager(Configuration configuration)
+    : implementation_(std::make_unique<Implementation>(*this, std::move(configuration))) {}
+
+ObjectManager::~ObjectManager() = default;
+
+const ClassRepository& ObjectManager::repository() const noexcept {
+    return implementation_->repository();
+}
+
+const std::vector<Registration>& ObjectManager::registrations() const noexcept {
+    return implementation_->registrations();
+}
+
+PathsResult ObjectManager::enumerateInstanceNames(const ObjectPath& path,
+                                                  const InstanceRequest& request) {
+    return implementation_->enumerateInstanceNames(path, request);
+}
+
+InstancesResult ObjectManager::enumerateInstances(const ObjectPath& path,
+                                                  const InstanceRequest& request) {
+    return implementation_->enumerateInstances(path, request);
+}
+
+InstancesResult ObjectManager::getInstance(const ObjectPath& path, const InstanceRequest& request) {
+    return implementation_->getInstance(path, request);
+}
+
+InstancesResult ObjectManager::modifyInstance(const Instance& instance,
+                                              const InstanceRequest& request) {
+    return implementation_->modifyInstance(instance, request);
+}
+
+PathsResult ObjectManager::associatorNames(const ObjectPath& path,
+                                           const AssociationRequest& request) {
+    return implementation_->associatorNames(path, request);
+}
+
+InstancesResult ObjectManager::associators(const ObjectPath& path,
+                                           const AssociationRequest& request) {
+    return implementation_->associators(path, request);
+}
+
+PathsResult ObjectManager::referenceNames(const ObjectPath& path,
+                                          const AssociationRequest& request) {
+    return implementation_->referenceNames(path, request);
+}
+
+InstancesResult ObjectManager::references(const ObjectPath& path,
+                                          const AssociationRequest& request) {
+    return implementation_->references(path, request);
+}
+
+}  // namespace cimom

@@ -1,0 +1,26 @@
+#pragma once
+
+#include <string>
+#include <vector>
+
+#include "cimom/Cim.h"
+#include "cimom/ClassRepository.h"
+
+namespace cimom {
+
+/// A namespace without slashes before and behind it.
+[[nodiscard]] std::string plainNameSpace(const std::string& nameSpace);
+
+/// Brings a client's path into the form that providers get: namespace and class
+/// in their canonical spelling, key values in the types that the class declares
+/// (text clients write references and datetimes as texts, and integers without
+/// size). The status is CMPI_RC_ERR_INVALID_NAMESPACE, CMPI_RC_ERR_INVALID_CLASS,
+/// or CMPI_RC_ERR_INVALID_PARAMETER for a key value that cannot be of its type.
+[[nodiscard]] Status canonicalize(ObjectPath& path, const ClassRepository& repository,
+                                  const std::vector<std::string>& nameSpaces);
+
+/// INVALID_PARAMETER when a text of the instance's properties holds a control
+/// character (below 0x20, or 0x7f): no administrator means one.
+[[nodiscard]] Status checkTexts(const Instance& instance);
+
+}  // namespace cimom
