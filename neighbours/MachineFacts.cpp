@@ -1,0 +1,66 @@
+#include "MachineFacts.h"
+
+#include <utility>
+
+#include "zrclient/Instrumentation.h"
+#include "zrcommon/SystemName.h"
+
+namespace ZR::DHCPClientNeighbours {
+
+using NodeLexicon::NodeType;
+using NodeLexicon::Properties;
+
+namespace {
+
+// The DHCP client provider names the same objects; its keys must agree with these.
+constexpr const char* serviceProcessorDescription = "BMC";
+constexpr const char* serviceProcessorName = "BMC:-1";
+
+bool isServiceProcessor(const Instrumentation& system) {
+    std::string description;
+    return system.getNodeDescription(description) && description == serviceProcessorDescription;
+}
+
+/// The computer two levels above an interface.
+Instrumentation systemOf(const Instrumentation& interface) {
+    Instrumentation node;
+    node.selectNode(interface.getPathToParentNode());
+    node.selectNode(node.getPathToParentNode());
+    return node;
+}
+
+}  // namespace
+
+std::vector<ComputerFacts> readComputers() {
+    std::vector<ComputerFacts> computers;
+    Instrumentation cursor;
+    for (cursor.selectNode(NodeType::ComputerSystem); cursor; ++cursor) {
+        ComputerFacts computer;
+        if (cursor.getProperty(Properties::Name, computer.name)) {
+            computer.isServiceProcessor = isServiceProcessor(cursor);
+            computers.push_back(std::move(computer));
+        }
+    }
+    return computers;
+}
+
+std::vector<InterfaceFacts> readInterfaces() {
+    std::vector<InterfaceFacts> interfaces;
+    const std::string hostName = getSystemName();
+    Instrumentation cursor;
+    for (cursor.selectNode(NodeType::NetworkInterface); cursor; ++cursor) {
+        InterfaceFacts interface;
+        if (!cursor.getProperty(Properties::Name, interface.name)) {
+            continue;
+        }
+        interface.ofServiceProcessor = isServiceProcessor(systemOf(cursor));
+        interface.systemName = interface.ofServiceProcessor ? serviceProcessorName : hostName;
+        // What cannot be read stays empty or unknown.
+        cursor.getProperty(Properties::IPv4Address, interface.ipv4Address);
+        cursor.getProperty(Properties::AddressSource, interface.addressSource);
+        interfaces.push_back(std::move(interface));
+    }
+    return interfaces;
+}
+
+}  // namespace ZR::DHCPClientNeighbours

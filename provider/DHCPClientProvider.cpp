@@ -1,0 +1,481 @@
+#include "DHCPClientProvider.h"
+
+#include <algorithm>
+#include <array>
+#include <exception>
+
+#include "CMPI/CMPIDHCPCapabilities.h"
+#include "CMPI/CMPIDHCPElementCapabilities.h"
+#include "CMPI/CMPIDHCPElementSettingData.h"
+#include "CMPI/CMPIDHCPHostedAccessPoint.h"
+#include "CMPI/CMPIDHCPOrderedComponent.h"
+#include "CMPI/CMPIDHCPProtocolEndpoint.h"
+#include "CMPI/CMPIDHCPRemoteAccessAvailableToElement.h"
+#include "CMPI/CMPIDHCPRemoteHostedAccessPoint.h"
+#include "CMPI/CMPIDHCPRemoteServiceAccessPoint.h"
+#include "CMPI/CMPIDHCPSettingData.h"
+#include "CMPI/CMPISAPSAPDependency.h"
+#include "include/TracePoint.h"
+#include "providerutilities/ProviderUtilities.h"
+
+namespace ZR::DHCPClientProvider {
+
+const std::string loggerDHCPClientProvider = loggerCategory;
+
+std::atomic<const CMPIBroker*> broker = nullptr;
+
+namespace {
+
+const TraceSource source{"DHCPClientProvider", loggerDHCPClientProvider};
+
+/// What one request hands to the walk that answers it.
+struct Request {
+    const CMPIContext* context;
+    const CMPIResult* result;
+    const CMPIObjectPath* path;
+    const char** properties;
+    TracePoint at;
+};
+
+/// Whether a walk tells the result that it is complete, or leaves that to the
+/// object manager. Which does which is uneven, and clients of old have got used to it.
+enum class Ending { returnDone, left };
+
+/// Passes one object on. The broker may have refused to make it: a null is told in
+/// a failure line and never reaches the object manager, some of which die of one.
+template <typename Object>
+void deliver(const Request& request, Object* object,
+             CMPIStatus (*give)(const CMPIResult*, const Object*)) {
+    if (object == nullptr) {
+        traceMessage(request.at, "The broker made no object; it is left out of the result");
+        return;
+    }
+    // An object manager that has given up on the request refuses; the walk is
+    // short enough to end by itself.
+    static_cast<void>(give(request.result, object));
+}
+
+template <typename Adapter, Ending ending>
+CMPIrc deliverPaths(const Request& request) {
+    for (Adapter adapter(broker, request.context, request.path); adapter; ++adapter) {
+        deliver(request, adapter.getObjectPath(), request.result->ft->returnObjectPath);
+    }
+    if constexpr (ending == Ending::returnDone) {
+        request.result->ft->returnDone(request.result);
+    }
+    return CMPI_RC_OK;
+}
+
+template <typename Adapter, Ending ending>
+CMPIrc deliverInstances(const Request& request) {
+    for (Adapter adapter(broker, request.context, request.path); adapter; ++adapter) {
+        deliver(request, adapter.getCMPIInstance(request.properties),
+                request.result->ft->returnInstance);
+    }
+    if constexpr (ending == Ending::returnDone) {
+        request.result->ft->returnDone(request.result);
+    }
+    return CMPI_RC_OK;
+}
+
+/// How each class is enumerated and fetched.
+struct ServedClass {
+    unsigned short id;
+    CMPIrc (*enumerateNames)(const Request&);
+    CMPIrc (*enumerate)(const Request&);
+    CMPIrc (*get)(const Request&);
+};
+
+CMPIrc notSupported(const Request& /*request*/) {
+    return CMPI_RC_ERR_NOT_SUPPORTED;
+}
+
+template <typename Adapter, Ending names, Ending instances, Ending get>
+constexpr ServedClass served(unsigned short id) {
+    return {id, &deliverPaths<Adapter, names>, &deliverInstances<Adapter, instances>,
+            &deliverInstances<Adapter, get>};
+}
+
+/// A class whose instances cannot be fetched singly.
+template <typename Adapter, Ending names, Ending instances>
+constexpr ServedClass enumerated(unsigned short id) {
+    return {id, &deliverPaths<Adapter, names>, &deliverInstances<Adapter, instances>,
+            &notSupported};
+}
+
+constexpr unsigned short settingDataId = 85;
+
+constexpr std::array servedClasses{
+    served<CMPIDHCPProtocolEndpoint, Ending::returnDone, Ending::returnDone, Ending::returnDone>(4),
+    served<CMPIDHCPCapabilities, Ending::returnDone, Ending::returnDone, Ending::returnDone>(5),
+    enumerated<CMPIDHCPElementCapabilities, Ending::returnDone, Ending::left>(6),
+    enumerated<CMPISAPSAPDependency, Ending::left, Ending::left>(8),
+    enumerated<CMPIDHCPHostedAccessPoint, Ending::returnDone, Ending::left>(34),
+    served<CMPIDHCPRemoteServiceAccessPoint, Ending::left, Ending::left, Ending::left>(82),
+    served<CMPIDHCPRemoteAccessAvailableToElement, Ending::left, Ending::left, Ending::left>(83),
+    served<CMPIDHCPRemoteHostedAccessPoint, Ending::left, Ending::left, Ending::left>(84),
+    served<CMPIDHCPSettingData, Ending::left, Ending::left, Ending::left>(settingDataId),
+    served<CMPIDHCPElementSettingData, Ending::left, Ending::left, Ending::left>(86),
+    served<CMPIDHCPOrderedComponent, Ending::left, Ending::left, Ending::left>(87),
+};
+
+/// The frame of an instance request: marks, the class identifier, and the one
+/// place where exceptions end. What was delivered before one stays delivered, and
+/// the status stays as it was: the failure shows in the log alone.
+template <typename Operation>
+CMPIStatus serve(const TracePoint& at, const CMPIObjectPath* path, Operation operation) {
+    markProviderEntry(loggerDHCPClientProvider, at.source.file, at.function, at.line);
+    const unsigned short classId = ProviderUtilities::getClassId(path);
+    traceVariable(at, "classId", classId);
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    try {
+        operation(classId, status);
+    } catch (const std::exception& exception) {
+        traceMessage(at, exception.what());
+    }
+    markProviderExit(loggerDHCPClientProvider, at.source.file, at.function, at.line);
+    return status;
+}
+
+/// Serves a request by the column of the table above that its operation names.
+CMPIStatus serveByTable(CMPIrc (*ServedClass::*column)(const Request&), const Request& request) {
+    return serve(request.at, request.path, [&](unsigned short classId, CMPIStatus& status) {
+        const auto* row =
+            std::find_if(servedClasses.begin(), servedClasses.end(),
+                         [classId](const ServedClass& entry) { return entry.id == classId; });
+        status.rc =
+            row == servedClasses.end() ? CMPI_RC_ERR_INVALID_CLASS : (row->*column)(request);
+    });
+}
+
+/// Create, delete and query, whatever their arguments.
+CMPIStatus refuse(const TracePoint& at) {
+    traceMethod(at);
+    return {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
+}
+
+CMPIStatus DHCPClient_Cleanup(CMPIInstanceMI* /*mi*/, const CMPIContext* /*ctx*/,
+                              CMPIBoolean /*terminating*/) {
+    return {CMPI_RC_OK, nullptr};
+}
+
+CMPIStatus DHCPClient_EnumInstanceNames(CMPIInstanceMI* /*mi*/, const CMPIContext* ctx,
+                                        const CMPIResult* result, const CMPIObjectPath* path) {
+    return serveByTable(&ServedClass::enumerateNames, {ctx, result, path, nullptr, ZR_HERE});
+}
+
+CMPIStatus DHCPClient_EnumInstances(CMPIInstanceMI* /*mi*/, const CMPIContext* ctx,
+                                    const CMPIResult* result, const CMPIObjectPath* path,
+                                    const char** properties) {
+    return serveByTable(&ServedClass::enumerate, {ctx, result, path, properties, ZR_HERE});
+}
+
+CMPIStatus DHCPClient_GetInstance(CMPIInstanceMI* /*mi*/, const CMPIContext* ctx,
+                                  const CMPIResult* result, const CMPIObjectPath* path,
+                                  const char** properties) {
+    return serveByTable(&ServedClass::get, {ctx, result, path, properties, ZR_HERE});
+}
+
+CMPIStatus DHCPClient_CreateInstance(CMPIInstanceMI* /*mi*/, const CMPIContext* /*ctx*/,
+                                     const CMPIResult* /*result*/, const CMPIObjectPath* /*path*/,
+                                     const CMPIInstance* /*instance*/) {
+    return refuse(ZR_HERE);
+}
+
+CMPIStatus DHCPClient_ModifyInstance(CMPIInstanceMI* /*mi*/, const CMPIContext* ctx,
+                                     const CMPIResult* result, const CMPIObjectPath* path,
+                                     const CMPIInstance* instance, const char** /*properties*/) {
+    const TracePoint at = ZR_HERE;
+    return serve(at, path, [&](unsigned short classId, CMPIStatus& status) {
+        if (classId != settingDataId) {
+            status.rc = CMPI_RC_ERR_NOT_SUPPORTED;
+            return;
+        }
+        const CMPIString* text = path->ft->toString(path, nullptr);
+        const char* l_strObjectPath = text == nullptr ? "" : text->ft->getCharPtr(text, nullptr);
+        traceVariable(at, "l_strObjectPath", l_strObjectPath);
+        CMPIDHCPSettingData adapter(broker, ctx, path);
+        if (adapter) {
+            // A message that the adapter attached is dropped.
+            status.rc = adapter.modifyInstance(instance).rc;
+        }
+        result->ft->returnDone(result);
+    });
+}
+
+CMPIStatus DHCPClient_DeleteInstance(CMPIInstanceMI* /*mi*/, const CMPIContext* /*ctx*/,
+                                     const CMPIResult* /*result*/, const CMPIObjectPath* /*path*/) {
+    return refuse(ZR_HERE);
+}
+
+CMPIStatus DHCPClient_ExecQuery(CMPIInstanceMI* /*mi*/, const CMPIContext* /*ctx*/,
+                                const CMPIResult* /*result*/, const CMPIObjectPath* /*path*/,
+                                const char* /*query*/, const char* /*language*/) {
+    return refuse(ZR_HERE);
+}
+
+/// How each association class answers the four association requests. The walks go
+/// on until the adapter ends; an exception leaves them.
+struct AssociationClass {
+    unsigned short id;
+    void (*associatorNames)(const Request&, const char* resultClass);
+    void (*associators)(const Request&, const char* resultClass);
+    CMPIrc (*referenceNames)(const Request&);
+    CMPIrc (*references)(const Request&);
+};
+
+using AssociatorColumn = void (*AssociationClass::*)(const Request&, const char* resultClass);
+using ReferenceColumn = CMPIrc (*AssociationClass::*)(const Request&);
+
+/// Walks the far ends, unless the client wants another class than the adapter has there.
+template <typename Adapter, typename Give>
+void walkFarEnds(const Request& request, const char* resultClass, const Give& give) {
+    Adapter adapter(broker, request.context, request.path);
+    if (resultClass != nullptr && adapter.isNotTargetClass(resultClass)) {
+        return;
+    }
+    for (; adapter; ++adapter) {
+        give(adapter);
+    }
+}
+
+template <typename Adapter>
+void deliverAssociatorNames(const Request& request, const char* resultClass) {
+    walkFarEnds<Adapter>(request, resultClass, [&request](Adapter& adapter) {
+        deliver(request, adapter.getAssociatorNames(), request.result->ft->returnObjectPath);
+    });
+}
+
+template <typename Adapter>
+void deliverAssociators(const Request& request, const char* resultClass) {
+    walkFarEnds<Adapter>(request, resultClass, [&request](Adapter& adapter) {
+        deliver(request, adapter.getAssociator(request.properties),
+                request.result->ft->returnInstance);
+    });
+}
+
+template <typename Adapter>
+constexpr AssociationClass association(unsigned short id) {
+    return {id, &deliverAssociatorNames<Adapter>, &deliverAssociators<Adapter>,
+            &deliverPaths<Adapter, Ending::left>, &deliverInstances<Adapter, Ending::left>};
+}
+
+constexpr std::array associationClasses{
+    association<CMPIDHCPElementCapabilities>(6),
+    association<CMPISAPSAPDependency>(8),
+    association<CMPIDHCPHostedAccessPoint>(34),
+    association<CMPIDHCPRemoteAccessAvailableToElement>(83),
+    association<CMPIDHCPRemoteHostedAccessPoint>(84),
+    association<CMPIDHCPElementSettingData>(86),
+    association<CMPIDHCPOrderedComponent>(87),
+};
+
+const AssociationClass* findAssociation(unsigned short classId) {
+    const auto* row =
+        std::find_if(associationClasses.begin(), associationClasses.end(),
+                     [classId](const AssociationClass& entry) { return entry.id == classId; });
+    return row == associationClasses.end() ? nullptr : row;
+}
+
+/// Associators and their names: every association that the request's class name
+/// stands for, one after the other. A failure in one ends that one alone, and
+/// never shows in the status.
+///
+/// The two handlers differ: an unknown association class is an empty success for
+/// names and an error for instances, and only the latter logs failures.
+CMPIStatus serveAssociators(const Request& request, const char* assocClass, const char* resultClass,
+                            AssociatorColumn column, bool names) {
+    const TracePoint& at = request.at;
+    markProviderEntry(loggerDHCPClientProvider, at.source.file, at.function, at.line);
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    bool served = true;
+    const auto guarded = [&](const auto& step) {
+        try {
+            step();
+        } catch (const std::exception& exception) {
+            if (!names) {
+                traceMessage(at, exception.what());
+            }
+        }
+    };
+    std::vector<unsigned short> classIds;
+    guarded([&] {
+        const std::string nameSpace = ProviderUtilities::getNamespace(request.path);
+        if (!getClassId(assocClass, nameSpace.c_str(), classIds)) {
+            traceVariable(at, "CMPI_RC_ERR_INVALID_CLASS", CMPI_RC_ERR_INVALID_CLASS);
+            if (!names) {
+                status.rc = CMPI_RC_ERR_INVALID_CLASS;
+            }
+        }
+    });
+    for (const unsigned short classId : classIds) {
+        const AssociationClass* association = findAssociation(classId);
+        served = association != nullptr;
+        if (served) {
+            guarded([&] { (association->*column)(request, resultClass); });
+        } else {
+            status.rc = CMPI_RC_ERR_INVALID_CLASS;
+        }
+        if (names) {
+            traceVariable(at, "rcode", served ? 1U : 0U);
+        }
+        if (!served) {
+            break;
+        }
+    }
+    if (served) {
+        request.result->ft->returnDone(request.result);
+    }
+    markProviderExit(loggerDHCPClientProvider, at.source.file, at.function, at.line);
+    return status;
+}
+
+/// References and their names: of the one association class that is named exactly.
+CMPIStatus serveReferences(const Request& request, const char* resultClass, ReferenceColumn column,
+                           bool names) {
+    const TracePoint& at = request.at;
+    markProviderEntry(loggerDHCPClientProvider, at.source.file, at.function, at.line);
+    const unsigned short classId = ProviderUtilities::getClassId(resultClass);
+    traceVariable(at, "classId", classId);
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    if (const AssociationClass* association = findAssociation(classId)) {
+        try {
+            status.rc = (association->*column)(request);
+            request.result->ft->returnDone(request.result);
+        } catch (const std::exception& exception) {
+            // The names handler is the silent one.
+            if (!names) {
+                traceMessage(at, exception.what());
+            }
+        }
+    } else {
+        status.rc = CMPI_RC_ERR_INVALID_CLASS;
+    }
+    markProviderExit(loggerDHCPClientProvider, at.source.file, at.function, at.line);
+    return status;
+}
+
+CMPIStatus DHCPClient_AssociationCleanup(CMPIAssociationMI* /*mi*/, const CMPIContext* /*ctx*/,
+                                         CMPIBoolean /*terminating*/) {
+    return {CMPI_RC_OK, nullptr};
+}
+
+// Roles are not looked at: a source is served in whatever role it plays.
+
+CMPIStatus DHCPClient_Associators(CMPIAssociationMI* /*mi*/, const CMPIContext* ctx,
+                                  const CMPIResult* result, const CMPIObjectPath* path,
+                                  const char* assocClass, const char* resultClass,
+                                  const char* /*role*/, const char* /*resultRole*/,
+                                  const char** properties) {
+    return serveAssociators({ctx, result, path, properties, ZR_HERE}, assocClass, resultClass,
+                            &AssociationClass::associators, false);
+}
+
+CMPIStatus DHCPClient_AssociatorNames(CMPIAssociationMI* /*mi*/, const CMPIContext* ctx,
+                                      const CMPIResult* result, const CMPIObjectPath* path,
+                                      const char* assocClass, const char* resultClass,
+                                      const char* /*role*/, const char* /*resultRole*/) {
+    return serveAssociators({ctx, result, path, nullptr, ZR_HERE}, assocClass, resultClass,
+                            &AssociationClass::associatorNames, true);
+}
+
+CMPIStatus DHCPClient_References(CMPIAssociationMI* /*mi*/, const CMPIContext* ctx,
+                                 const CMPIResult* result, const CMPIObjectPath* path,
+                                 const char* resultClass, const char* /*role*/,
+                                 const char** properties) {
+    return serveReferences({ctx, result, path, properties, ZR_HERE}, resultClass,
+                           &AssociationClass::references, false);
+}
+
+CMPIStatus DHCPClient_ReferenceNames(CMPIAssociationMI* /*mi*/, const CMPIContext* ctx,
+                                     const CMPIResult* result, const CMPIObjectPath* path,
+                                     const char* resultClass, const char* /*role*/) {
+    return serveReferences({ctx, result, path, nullptr, ZR_HERE}, resultClass,
+                           &AssociationClass::referenceNames, true);
+}
+
+/// The standard association classes and the served ones under each.
+struct ParentClass {
+    const char* name;
+    std::array<unsigned short, 2> served;  ///< 0: none
+};
+
+constexpr std::array<ParentClass, 6> parentClasses{{
+    {"CIM_ElementCapabilities", {6, 0}},
+    {"CIM_HostedAccessPoint", {34, 84}},
+    {"CIM_SAPSAPDependency", {8, 0}},
+    {"CIM_OrderedComponent", {87, 0}},
+    {"CIM_RemoteAccessAvailableToElement", {83, 0}},
+    {"CIM_ElementSettingData", {86, 0}},
+}};
+
+}  // namespace
+
+bool getClassId(const char* className, const char* nameSpace,
+                std::vector<unsigned short>& classIds) {
+    const unsigned short classId = ProviderUtilities::getClassId(className);
+    if (classId != ProviderUtilities::unknownClass) {
+        classIds.push_back(classId);
+        return true;
+    }
+    bool found = false;
+    const std::string place = nameSpace == nullptr ? "" : nameSpace;
+    // A name may be related to several: a common ancestor, say.
+    for (const ParentClass& parent : parentClasses) {
+        if (!ProviderUtilities::areClassesRelated(broker, place, className, parent.name)) {
+            continue;
+        }
+        found = true;
+        for (const unsigned short servedId : parent.served) {
+            if (servedId != 0) {
+                classIds.push_back(servedId);
+            }
+        }
+    }
+    return found;
+}
+
+constexpr int cmpiLevel = 200;
+
+const CMPIInstanceMIFT instMIFT__{
+    cmpiLevel,
+    cmpiLevel,
+    "instanceDHCPClientProvider",
+    &DHCPClient_Cleanup,
+    &DHCPClient_EnumInstanceNames,
+    &DHCPClient_EnumInstances,
+    &DHCPClient_GetInstance,
+    &DHCPClient_CreateInstance,
+    &DHCPClient_ModifyInstance,
+    &DHCPClient_DeleteInstance,
+    &DHCPClient_ExecQuery,
+};
+
+const CMPIAssociationMIFT assocMIFT__{
+    cmpiLevel,
+    cmpiLevel,
+    "associationDHCPClientProvider",
+    &DHCPClient_AssociationCleanup,
+    &DHCPClient_Associators,
+    &DHCPClient_AssociatorNames,
+    &DHCPClient_References,
+    &DHCPClient_ReferenceNames,
+};
+
+}  // namespace ZR::DHCPClientProvider
+
+CMPIInstanceMI* DHCPClientProvider_Create_InstanceMI(const CMPIBroker* broker,
+                                                     const CMPIContext* /*ctx*/,
+                                                     CMPIStatus* /*rc*/) {
+    static CMPIInstanceMI mi{nullptr, &ZR::DHCPClientProvider::instMIFT__};
+    ZR::DHCPClientProvider::broker = broker;
+    return &mi;
+}
+
+CMPIAssociationMI* DHCPClientProvider_Create_AssociationMI(const CMPIBroker* broker,
+                                                           const CMPIContext* /*ctx*/,
+                                                           CMPIStatus* /*rc*/) {
+    static CMPIAssociationMI mi{nullptr, &ZR::DHCPClientProvider::assocMIFT__};
+    ZR::DHCPClientProvider::broker = broker;
+    return &mi;
+}

@@ -1,0 +1,68 @@
+#include "Lindows/AssociationRecord.h"
+
+namespace ZR::DHCPClientProvider {
+
+using NodeLexicon::NodeType;
+using NodeLexicon::Properties;
+
+std::optional<std::string> findKey(Moniker& moniker, const char* name, Occurrence occurrence,
+                                   const TracePoint& at) {
+    std::optional<std::string> found;
+    const std::size_t count = moniker.getKeyCount();
+    for (std::size_t i = 0; i < count; ++i) {
+        std::string keyName;
+        std::string value;
+        if (!moniker.selectKey(i) || !moniker.getName(keyName) || keyName != name ||
+            !moniker.getValue(value)) {
+            continue;
+        }
+        traceVariable(at, name, value);
+        found = std::move(value);
+        if (occurrence == Occurrence::first) {
+            break;
+        }
+    }
+    return found;
+}
+
+std::string requireKey(Moniker& moniker, const char* name, const char* message,
+                       const TracePoint& at) {
+    std::optional<std::string> value = findKey(moniker, name, Occurrence::first, at);
+    if (!value) {
+        throw FrameworkException(message);
+    }
+    return *std::move(value);
+}
+
+Moniker monikerOf(const char* name, const std::string& value) {
+    Moniker moniker;
+    moniker.addKey(name, value);
+    return moniker;
+}
+
+Moniker findSystemMoniker(Instrumentation& cursor, Moniker& known, const TracePoint& at) {
+    const std::string systemName =
+        requireKey(known, "SystemName", "Could not find 'System Name' Key in Moniker", at);
+    for (cursor.selectNode(NodeType::ComputerSystem); cursor; ++cursor) {
+        std::string name;
+        if (!cursor.getProperty(Properties::Name, name)) {
+            throw InstrumentationException("Name Property on computer not available.");
+        }
+        if (name == systemName) {
+            return monikerOf("Name", name);
+        }
+    }
+    throw InstrumentationException("Concerned Computer Could Not Be Found.");
+}
+
+std::string interfaceOfAccessPoint(const std::string& accessPointName, const TracePoint& at) {
+    const std::size_t end = accessPointName.rfind('_');
+    if (end == std::string::npos) {
+        throw FrameworkException("Name Key is not correct.");
+    }
+    std::string nameKey = accessPointName.substr(0, end);
+    traceVariable(at, "nameKey", nameKey);
+    return nameKey;
+}
+
+}  // namespace ZR::DHCPClientProvider

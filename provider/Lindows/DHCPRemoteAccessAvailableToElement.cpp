@@ -1,0 +1,92 @@
+#include "Lindows/DHCPRemoteAccessAvailableToElement.h"
+
+#include "Lindows/AssociationRecord.h"
+#include "Lindows/DHCPRemoteServiceAccessPoint.h"
+
+namespace ZR::DHCPClientProvider {
+
+using NodeLexicon::NodeType;
+using NodeLexicon::Properties;
+
+const std::string loggerDHCPRemoteAccessAvailableToElement = loggerCategory;
+
+namespace {
+
+const TraceSource source{"Lindows/DHCPRemoteAccessAvailableToElement",
+                         loggerDHCPRemoteAccessAvailableToElement};
+
+constexpr const char* noNameKey = "Could not find 'Name' Key in Moniker";
+
+}  // namespace
+
+DHCPRemoteAccessAvailableToElement::DHCPRemoteAccessAvailableToElement() {
+    traceMethod(ZR_HERE);
+}
+
+DHCPRemoteAccessAvailableToElement::~DHCPRemoteAccessAvailableToElement() {
+    traceMethod(ZR_HERE);
+}
+
+Moniker DHCPRemoteAccessAvailableToElement::getRemoteServiceAccessPointMoniker(
+    Moniker& monikerDHCPEndpoint) {
+    const ParameterScope scope(ZR_HERE, " monikerDHCPEndpoint=", &monikerDHCPEndpoint);
+    const std::string endpointName = requireKey(monikerDHCPEndpoint, "Name", noNameKey, ZR_HERE);
+    DHCPRemoteServiceAccessPoint accessPoint;
+    std::string accessPointName;
+    const TracePoint at = ZR_HERE;
+    // One malformed name on the way ends the whole search.
+    if (!walkTo(accessPoint, [&](const auto& element) {
+            accessPointName.clear();
+            element.getName(accessPointName);
+            return interfaceOfAccessPoint(accessPointName, at) == endpointName;
+        })) {
+        // It is the access point that is missing; clients know the text.
+        throw InstrumentationException("Concerned DHCP Protocol Endpoint Could Not Be Found.");
+    }
+    orderOfAccess_ = static_cast<unsigned short>(accessPoint.getOrderOfAccess());
+    return monikerOf("Name", accessPointName);
+}
+
+Moniker DHCPRemoteAccessAvailableToElement::getDHCPProtocolEndpointMoniker(
+    Moniker& accesspointmoniker) {
+    const ParameterScope scope(ZR_HERE, " accesspointmoniker=", &accesspointmoniker);
+    const TracePoint at = ZR_HERE;
+    const auto last = [&](const char* key) {
+        return findKey(accesspointmoniker, key, Occurrence::last, at);
+    };
+    const std::optional<std::string> name = last("Name");
+    const std::string systemClass = last("SystemCreationClassName").value_or("");
+    const std::string systemName = last("SystemName").value_or("");
+    if (!name) {
+        throw FrameworkException(noNameKey);
+    }
+    const std::string nameKey = interfaceOfAccessPoint(*name, at);
+    Instrumentation& cursor = *this;
+    for (cursor.selectNode(NodeType::NetworkInterface); cursor; ++cursor) {
+        std::string interfaceName;
+        std::vector<std::string> servers;
+        if (!cursor.getProperty(Properties::Name, interfaceName) || interfaceName != nameKey ||
+            !cursor.getProperty(Properties::DHCPServerAddresses, servers)) {
+            continue;
+        }
+        if (servers.size() > 1) {
+            orderOfAccess_ = 0;
+        }
+        Moniker endpoint;
+        endpoint.addKey("Name", nameKey);
+        endpoint.addKey("SystemName", systemName);
+        endpoint.addKey("SystemCreationClassName", systemClass);
+        endpoint.addKey("CreationClassName", "QVXZR_DHCPProtocolEndpoint");
+        return endpoint;
+    }
+    // It is a DHCP endpoint that is missing; clients know the text.
+    throw InstrumentationException("Concerned IP Protocol Endpoint Could Not Be Found.");
+}
+
+bool DHCPRemoteAccessAvailableToElement::getOrderOfAccess(unsigned short& order) const {
+    const ParameterScope scope(ZR_HERE, " order=", &order);
+    order = orderOfAccess_;
+    return true;
+}
+
+}  // namespace ZR::DHCPClientProvider

@@ -1,0 +1,99 @@
+#pragma once
+
+#include <exception>
+#include <string>
+
+#include "include/Trace.h"
+#include "tklogger/TKLogger.h"
+#include "tklogger/TKMessageBuffer.h"
+
+/// The places from which the provider traces. A source file names itself once,
+///
+///     const ZR::TraceSource source{"Lindows/DHCPProtocolEndpoint", loggerDHCPProtocolEndpoint};
+///
+/// and each of its trace points says ZR_HERE.
+namespace ZR {
+
+/// The category of all lines of the provider. Each source file has a logger string
+/// of its own that holds it.
+inline constexpr const char* loggerCategory = "Merrow.DHCPClientProvider";
+
+/// A source file: its path below the provider's folder, without extension, and its logger.
+struct TraceSource {
+    const char* file;
+    const std::string& logger;
+};
+
+struct TracePoint {
+    const TraceSource& source;
+    const char* function;
+    unsigned line;
+};
+
+/// This function and line of the file whose TraceSource is called `source`.
+#define ZR_HERE (::ZR::TracePoint{source, __func__, __LINE__})
+
+/// Hands a line to both roads of the logging service. The text is formatted anew
+/// for the second, since the first may have traced on its own.
+template <typename Text>
+void writeLine(const TracePoint& at, int level, const Text& text) {
+    {
+        TKLog::TKMessageBuffer line;
+        line << text();
+        TKLog::TKLogger::logLevelMessage(at.source.file, at.function, at.line, at.source.logger,
+                                         level, nullptr, 0, 0, line.str());
+    }
+    TKLog::TKMessageBuffer line;
+    line << text();
+    TKLog::TKLogger::traceLevelMessage(at.source.file, at.function, at.line, at.source.logger,
+                                       level, nullptr, 0, 0, line.str());
+}
+
+/// VARIABLE lines.
+void traceVariable(const TracePoint& at, const char* name, const char* value);
+void traceVariable(const TracePoint& at, const char* name, const std::string& value);
+void traceVariable(const TracePoint& at, const char* name, unsigned value);
+
+/// A METHOD line.
+void traceMethod(const TracePoint& at);
+
+/// A MESSAGE line, at the level of failures.
+void traceMessage(const TracePoint& at, const char* text);
+
+/// Traces the entry to a function, and its exit unless an exception leaves it.
+class TraceScope {
+  public:
+    explicit TraceScope(const TracePoint& at);
+    TraceScope(const TraceScope&) = delete;
+    TraceScope& operator=(const TraceScope&) = delete;
+    ~TraceScope();
+
+  private:
+    TracePoint at_;
+    int exceptions_ = std::uncaught_exceptions();
+};
+
+/// The same for a function with parameters: pairs of " name=" and a value, the
+/// value of a pointer being its address.
+class ParameterScope {
+  public:
+    template <typename... Pieces>
+    explicit ParameterScope(const TracePoint& at, const Pieces&... pieces) : at_(at) {
+        (parameters_ << ... << pieces);
+        constexpr char terminator = '\0';  // formatting needs one
+        parameters_ << std::string_view(&terminator, 1);
+        trace(entering);
+    }
+    ParameterScope(const ParameterScope&) = delete;
+    ParameterScope& operator=(const ParameterScope&) = delete;
+    ~ParameterScope();
+
+  private:
+    void trace(MessageType type) const;
+
+    TracePoint at_;
+    int exceptions_ = std::uncaught_exceptions();
+    TKLog::TKMessageBuffer parameters_;
+};
+
+}  // namespace ZR

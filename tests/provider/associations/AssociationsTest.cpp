@@ -1,0 +1,476 @@
+// The seven associations, walked from every side on one machine: a host with three
+// DHCP interfaces, one of which has two servers, a static one, and a service processor.
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <map>
+#include <string>
+#include <vector>
+
+#include "CMPI/Host.h"
+#include "Tree.h"
+#include "support/LogCapture.h"
+
+namespace {
+
+using test::dhcpInterface;
+using test::host;
+using test::Host;
+using test::Json;
+using test::keyOf;
+using test::pathOf;
+using test::serviceProcessor;
+using test::staticInterface;
+using ::testing::ElementsAre;
+using ::testing::IsEmpty;
+using ::testing::SizeIs;
+using ZR::Testing::LogCapture;
+
+Json withAddress(Json node, const char* address) {
+    node["properties"]["IPv4Address"] = address;
+    return node;
+}
+
+using Texts = std::vector<std::string>;
+
+/// A path in few words: the class without its prefix, and the key that tells one
+/// object from the other. References are written in brackets, in the order of roles.
+std::string brief(const std::optional<cimom::ObjectPath>& path) {
+    if (!path) {
+        return "null";
+    }
+    std::string text = path->className.substr(path->className.find('_') + 1);
+    for (const char* role : {"Antecedent", "Dependent", "ManagedElement", "Capabilities",
+                             "SettingData", "GroupComponent", "PartComponent"}) {
+        const cimom::Value* reference = path->key(role);
+        if (reference == nullptr) {
+            continue;
+        }
+        const auto& target =
+            std::get<std::shared_ptr<const cimom::ObjectPath>>(*reference->scalar());
+        text += std::string(" ") + role + "[" + brief(*target) + "]";
+    }
+    for (const char* name : {"InstanceID", "SystemName", "Name"}) {
+        if (const auto value = keyOf(*path, name)) {
+            text += " " + *value;
+        }
+    }
+    return text;
+}
+
+Texts briefs(const Host::Answer& answer) {
+    Texts texts;
+    for (const auto& path : answer.paths) {
+        texts.push_back(brief(path));
+    }
+    for (const auto& instance : answer.instances) {
+        texts.push_back(instance ? brief(instance->path) : "null");
+    }
+    return texts;
+}
+
+class AssociationsTest : public test::TreeTest {
+  protected:
+    void SetUp() override {
+        TreeTest::SetUp();
+        setTree(
+            {host({withAddress(dhcpInterface("eth0", {"192.0.2.1"}), "192.0.2.10"),
+                   withAddress(dhcpInterface("eth1", {"192.0.2.1", "2001:db8::1"}), "192.0.2.11"),
+                   withAddress(dhcpInterface("eth2"), "192.0.2.12"),
+                   withAddress(staticInterface("eth3"), "192.0.2.13")}),
+             serviceProcessor({withAddress(dhcpInterface("bmc0"), "192.0.2.20")})});
+    }
+
+    cimom::ObjectPath endpoint(const std::string& name) const {
+        return pathOf("QVXZR_DHCPProtocolEndpoint",
+                      {{"SystemCreationClassName", "QVXZR_ComputerSystem"},
+                       {"SystemName", hostName()},
+                       {"CreationClassName", "QVXZR_DHCPProtocolEndpoint"},
+                       {"Name", name}});
+    }
+
+    cimom::ObjectPath computer(const std::string& name) const {
+        return pathOf("QVXZR_ComputerSystem",
+                      {{"CreationClassName", "QVXZR_ComputerSystem"}, {"Name", name}});
+    }
+
+    std::string ofHost(const std::string& text) const {
+        std::string result = text;
+        for (std::size_t at = result.find('@'); at != std::string::npos; at = result.find('@')) {
+            result.replace(at, 1, hostName());
+        }
+        return result;
+    }
+
+    Texts ofHost(const Texts& texts) const {
+        Texts result;
+        for (const std::string& text : texts) {
+            result.push_back(ofHost(text));
+        }
+        return result;
+    }
+
+    Host host_{Host::Neighbours::served};
+};
+
+// Hosted access point.
+
+constexpr const char* hosted = "QVXZR_HostedDHCPPoint";
+
+TEST_F(AssociationsTest, EndpointHasItsComputer) {
+    const Host::Answer names = host_.associatorNames(endpoint("eth0"), hosted);
+    EXPECT_EQ(names.code, CMPI_RC_OK);
+    EXPECT_EQ(briefs(names), ofHost(Texts{"ComputerSystem @"}));
+    EXPECT_EQ(names.returnDoneCalls, 1U);
+    EXPECT_EQ(briefs(host_.associators(endpoint("eth0"), hosted)),
+              ofHost(Texts{"ComputerSystem @"}));
+}
+
+TEST_F(AssociationsTest, EndpointOfTheServiceProcessorReachesItsComputer) {
+    cimom::ObjectPath path =
+        pathOf("QVXZR_DHCPProtocolEndpoint", {{"SystemName", "BMC:-1"}, {"Name", "bmc0"}});
+    EXPECT_THAT(briefs(host_.associatorNames(path, hosted)),
+                ElementsAre("SPComputerSystem BMC:-1"));
+}
+
+// The static interface agrees with the system name filter and is then skipped for
+// its DHCP flag; what follows it is not filtered again, and so is delivered too.
+TEST_F(AssociationsTest, ComputerHasItsEndpointsAndTheOneBehindAnInterfaceWithoutDHCP) {
+    const Host::Answer names = host_.associatorNames(computer(hostName()), hosted);
+    EXPECT_EQ(briefs(names),
+              ofHost(Texts{"DHCPProtocolEndpoint @ eth0", "DHCPProtocolEndpoint @ eth1",
+                           "DHCPProtocolEndpoint @ eth2", "DHCPProtocolEndpoint BMC:-1 bmc0"}));
+    EXPECT_EQ(briefs(host_.associators(computer(hostName()), hosted)), briefs(names));
+}
+
+TEST_F(AssociationsTest, ReferenceOfAnEndpointHasTheComputersPathAndAnEndpointPathOfOurs) {
+    const Host::Answer names = host_.referenceNames(endpoint("eth0"), hosted);
+    ASSERT_EQ(names.code, CMPI_RC_OK);
+    EXPECT_EQ(briefs(names), ofHost(Texts{"HostedDHCPPoint Antecedent[ComputerSystem @] "
+                                          "Dependent[DHCPProtocolEndpoint @ eth0]"}));
+    EXPECT_EQ(names.returnDoneCalls, 1U);
+    const Host::Answer instances = host_.references(endpoint("eth0"), hosted);
+    ASSERT_THAT(instances.instances, SizeIs(1));
+    EXPECT_NE(instances.instances[0]->property("Antecedent"), nullptr);
+    EXPECT_NE(instances.instances[0]->property("Dependent"), nullptr);
+    EXPECT_EQ(briefs(instances), briefs(names));
+}
+
+TEST_F(AssociationsTest, EnumeratingTheHostedClassYieldsThePairs) {
+    const Host::Answer names = host_.enumerateNames(pathOf(hosted));
+    EXPECT_EQ(briefs(names), ofHost(Texts{"HostedDHCPPoint Antecedent[ComputerSystem @] "
+                                          "Dependent[DHCPProtocolEndpoint @ eth0]",
+                                          "HostedDHCPPoint Antecedent[ComputerSystem @] "
+                                          "Dependent[DHCPProtocolEndpoint @ eth1]",
+                                          "HostedDHCPPoint Antecedent[ComputerSystem @] "
+                                          "Dependent[DHCPProtocolEndpoint @ eth2]",
+                                          "HostedDHCPPoint Antecedent[ComputerSystem @] "
+                                          "Dependent[DHCPProtocolEndpoint BMC:-1 bmc0]"}));
+    EXPECT_EQ(names.returnDoneCalls, 1U);
+    EXPECT_EQ(host_.enumerate(pathOf(hosted)).returnDoneCalls, 0U);
+}
+
+TEST_F(AssociationsTest, EnumeratingTheHostedClassWithoutAnEndpointYieldsNothing) {
+    setTree({host({staticInterface("eth0")})});
+    EXPECT_THAT(briefs(host_.enumerateNames(pathOf(hosted))), IsEmpty());
+}
+
+TEST_F(AssociationsTest, EndpointPathWithoutKeysYieldsEveryComputerThatIsEnumerated) {
+    EXPECT_EQ(briefs(host_.associatorNames(pathOf("QVXZR_DHCPProtocolEndpoint"), hosted)),
+              ofHost(Texts{"ComputerSystem @"}));
+}
+
+TEST_F(AssociationsTest, ResultClassIsComparedWithoutCaseButNoSuperclassCounts) {
+    const auto path = computer(hostName());
+    EXPECT_THAT(briefs(host_.associators(path, hosted, "cim_dhcpprotocolendpoint")), SizeIs(4));
+    EXPECT_THAT(briefs(host_.associatorNames(path, hosted, "QVXZR_DHCPPROTOCOLENDPOINT")),
+                SizeIs(4));
+    for (const char* other : {"CIM_ProtocolEndpoint", "CIM_ComputerSystem", "", "x"}) {
+        const Host::Answer answer = host_.associatorNames(path, hosted, other);
+        EXPECT_THAT(answer.paths, IsEmpty()) << other;
+        EXPECT_EQ(answer.code, CMPI_RC_OK);
+        EXPECT_EQ(answer.returnDoneCalls, 1U);
+    }
+}
+
+// Association requests and the classes that they name.
+
+TEST_F(AssociationsTest, StandardParentRunsBothHostedAssociationsAndEndsOnce) {
+    const Host::Answer answer =
+        host_.associatorNames(computer(hostName()), "CIM_HostedAccessPoint");
+    EXPECT_EQ(briefs(answer),
+              ofHost(Texts{"DHCPProtocolEndpoint @ eth0", "DHCPProtocolEndpoint @ eth1",
+                           "DHCPProtocolEndpoint @ eth2", "DHCPProtocolEndpoint BMC:-1 bmc0",
+                           "DHCPRemoteServiceAccessPoint @ eth0_IPv4",
+                           "DHCPRemoteServiceAccessPoint @ eth1_IPv4",
+                           "DHCPRemoteServiceAccessPoint @ eth1_IPv6"}));
+    EXPECT_EQ(answer.returnDoneCalls, 1U);
+}
+
+TEST_F(AssociationsTest, UnknownAssociationClassIsAnEmptySuccessForNamesAndInvalidForInstances) {
+    const Host::Answer names = host_.associatorNames(endpoint("eth0"), "CIM_NoSuchClass");
+    EXPECT_EQ(names.code, CMPI_RC_OK);
+    EXPECT_THAT(names.paths, IsEmpty());
+    EXPECT_EQ(names.returnDoneCalls, 1U);
+    const Host::Answer instances = host_.associators(endpoint("eth0"), "CIM_NoSuchClass");
+    EXPECT_EQ(instances.code, CMPI_RC_ERR_INVALID_CLASS);
+    EXPECT_FALSE(instances.hasMessage);
+    EXPECT_THAT(instances.instances, IsEmpty());
+    EXPECT_EQ(instances.returnDoneCalls, 1U);
+}
+
+TEST_F(AssociationsTest, ElementClassAsAssociationClassIsInvalidAndLeavesTheResultOpen) {
+    const LogCapture log(4000);
+    for (const Host::Answer& answer :
+         {host_.associatorNames(endpoint("eth0"), "QVXZR_DHCPSettingData"),
+          host_.associators(endpoint("eth0"), "QVXZR_DHCPSettingData")}) {
+        EXPECT_EQ(answer.code, CMPI_RC_ERR_INVALID_CLASS);
+        EXPECT_EQ(answer.returnDoneCalls, 0U);
+    }
+    EXPECT_THAT(log.logMessages(),
+                ::testing::Contains(::testing::StartsWith("VARIABLE: 'rcode' has Value '0'")));
+}
+
+TEST_F(AssociationsTest, ReferencesServeOnlyTheExactClass) {
+    for (const char* name :
+         {"CIM_ElementSettingData", "CIM_HostedAccessPoint", "CIM_NoSuchClass"}) {
+        for (const Host::Answer& answer : {host_.referenceNames(endpoint("eth0"), name),
+                                           host_.references(endpoint("eth0"), name)}) {
+            EXPECT_EQ(answer.code, CMPI_RC_ERR_INVALID_CLASS) << name;
+            EXPECT_EQ(answer.returnDoneCalls, 0U);
+        }
+    }
+    EXPECT_EQ(host_.referenceNames(endpoint("eth0"), nullptr).code, CMPI_RC_ERR_INVALID_CLASS);
+    const Host::Answer served =
+        host_.referenceNames(endpoint("eth0"), "QVXZR_DHCPElementSettingData");
+    EXPECT_EQ(briefs(served),
+              ofHost(Texts{"DHCPElementSettingData ManagedElement[DHCPProtocolEndpoint @ eth0] "
+                           "SettingData[DHCPSettingData Computer%eth0]"}));
+    EXPECT_EQ(served.returnDoneCalls, 1U);
+}
+
+TEST_F(AssociationsTest, NoAssociationClassRunsAllSeven) {
+    const Host::Answer answer = host_.associatorNames(endpoint("eth0"), nullptr);
+    EXPECT_EQ(answer.code, CMPI_RC_OK);
+    EXPECT_EQ(
+        briefs(answer),
+        ofHost(Texts{"DHCPCapabilities eth0", "ComputerSystem @", "IPProtocolEndpoint @ eth0",
+                     "DHCPRemoteServiceAccessPoint @ eth0_IPv4",
+                     "DHCPRemoteServiceAccessPoint @ eth1_IPv4",
+                     "DHCPRemoteServiceAccessPoint @ eth1_IPv6", "DHCPSettingData Computer%eth0"}));
+    EXPECT_EQ(answer.returnDoneCalls, 1U);
+}
+
+// The other six.
+
+TEST_F(AssociationsTest, IPEndpointAndDHCPEndpointLeadToEachOther) {
+    constexpr const char* name = "QVXZR_SAPSAPDependency";
+    EXPECT_EQ(briefs(host_.associatorNames(endpoint("eth1"), name)),
+              ofHost(Texts{"IPProtocolEndpoint @ eth1"}));
+    const auto ip =
+        pathOf("QVXZR_IPProtocolEndpoint", {{"SystemCreationClassName", "QVXZR_ComputerSystem"},
+                                            {"SystemName", hostName()},
+                                            {"CreationClassName", "QVXZR_IPProtocolEndpoint"},
+                                            {"Name", "eth1"}});
+    EXPECT_EQ(briefs(host_.associators(ip, name)), ofHost(Texts{"DHCPProtocolEndpoint @ eth1"}));
+}
+
+TEST_F(AssociationsTest, ReferenceOfAnIPEndpointIsRecomputedFromTheDHCPEndpoint) {
+    // The source path lacks a key that the recomputed reference has.
+    const auto ip =
+        pathOf("QVXZR_IPProtocolEndpoint", {{"SystemName", hostName()}, {"Name", "eth1"}});
+    const Host::Answer answer = host_.referenceNames(ip, "QVXZR_SAPSAPDependency");
+    ASSERT_THAT(answer.paths, SizeIs(1));
+    const auto& antecedent = std::get<std::shared_ptr<const cimom::ObjectPath>>(
+        *answer.paths[0]->key("Antecedent")->scalar());
+    EXPECT_EQ(keyOf(*antecedent, "CreationClassName"), "QVXZR_IPProtocolEndpoint");
+    EXPECT_EQ(keyOf(*antecedent, "Name"), "eth1");
+}
+
+TEST_F(AssociationsTest, EndpointAndCapabilitiesLeadToEachOther) {
+    constexpr const char* name = "QVXZR_DHCPElementCapabilities";
+    EXPECT_EQ(briefs(host_.associatorNames(endpoint("eth1"), name)),
+              Texts{"DHCPCapabilities eth1"});
+    const auto capabilities = pathOf("QVXZR_DHCPCapabilities", {{"InstanceID", "eth1"}});
+    EXPECT_EQ(briefs(host_.associators(capabilities, name)),
+              ofHost(Texts{"DHCPProtocolEndpoint @ eth1"}));
+    const Host::Answer references = host_.references(capabilities, name);
+    ASSERT_THAT(references.instances, SizeIs(1));
+    EXPECT_EQ(references.instances[0]->property("Characteristics"), nullptr);
+}
+
+TEST_F(AssociationsTest, AccessPointAndItsComputerLeadToEachOther) {
+    constexpr const char* name = "QVXZR_DHCPRemoteHostedAccessPoint";
+    const auto accessPoint = pathOf("QVXZR_DHCPRemoteServiceAccessPoint",
+                                    {{"SystemName", hostName()}, {"Name", "eth0_IPv4"}});
+    EXPECT_EQ(briefs(host_.associatorNames(accessPoint, name)), ofHost(Texts{"ComputerSystem @"}));
+    EXPECT_THAT(briefs(host_.associators(computer(hostName()), name)), SizeIs(3));
+    EXPECT_EQ(briefs(host_.enumerateNames(pathOf(name))),
+              ofHost(Texts{"DHCPRemoteHostedAccessPoint Antecedent[ComputerSystem @] "
+                           "Dependent[DHCPRemoteServiceAccessPoint @ eth0_IPv4]",
+                           "DHCPRemoteHostedAccessPoint Antecedent[ComputerSystem @] "
+                           "Dependent[DHCPRemoteServiceAccessPoint @ eth1_IPv4]",
+                           "DHCPRemoteHostedAccessPoint Antecedent[ComputerSystem @] "
+                           "Dependent[DHCPRemoteServiceAccessPoint @ eth1_IPv6]"}));
+}
+
+TEST_F(AssociationsTest, OrderOfAccessOfAReferenceDependsOnWhereTheWalkStarted) {
+    constexpr const char* name = "QVXZR_DHCPRemoteAccessAvailableToElement";
+    const auto order = [](const Host::Answer& answer) {
+        std::vector<std::uint64_t> values;
+        for (const auto& instance : answer.instances) {
+            values.push_back(test::numberOf(*instance, "OrderOfAccess").value_or(77));
+        }
+        return values;
+    };
+    const auto accessPoint = [this](const char* key) {
+        return pathOf("QVXZR_DHCPRemoteServiceAccessPoint",
+                      {{"SystemName", hostName()}, {"Name", key}});
+    };
+    // One server: untouched. Several: 0 after the look-up from the access point.
+    EXPECT_THAT(order(host_.references(accessPoint("eth0_IPv4"), name)), ElementsAre(1));
+    EXPECT_THAT(order(host_.references(accessPoint("eth1_IPv4"), name)), ElementsAre(0));
+    EXPECT_THAT(briefs(host_.associatorNames(accessPoint("eth1_IPv4"), name)),
+                ElementsAre(ofHost("DHCPProtocolEndpoint @ eth1")));
+}
+
+TEST_F(AssociationsTest, EndpointReachesTheAccessPointsOfEveryInterfaceWithoutUnderscore) {
+    EXPECT_EQ(
+        briefs(host_.associatorNames(endpoint("eth1"), "QVXZR_DHCPRemoteAccessAvailableToElement")),
+        ofHost(Texts{"DHCPRemoteServiceAccessPoint @ eth0_IPv4",
+                     "DHCPRemoteServiceAccessPoint @ eth1_IPv4",
+                     "DHCPRemoteServiceAccessPoint @ eth1_IPv6"}));
+}
+
+TEST_F(AssociationsTest, EndpointAndSettingLeadToEachOther) {
+    constexpr const char* name = "QVXZR_DHCPElementSettingData";
+    EXPECT_EQ(briefs(host_.associatorNames(endpoint("eth2"), name)),
+              Texts{"DHCPSettingData Computer%eth2"});
+    const auto setting = pathOf("QVXZR_DHCPSettingData", {{"InstanceID", "Computer%eth2"}});
+    EXPECT_EQ(briefs(host_.associators(setting, name)),
+              ofHost(Texts{"DHCPProtocolEndpoint @ eth2"}));
+    const Host::Answer references = host_.references(setting, name);
+    ASSERT_THAT(references.instances, SizeIs(1));
+    EXPECT_EQ(test::numberOf(*references.instances[0], "IsCurrent"), 1U);
+    EXPECT_EQ(references.instances[0]->property("IsCurrent")->type, cimom::Type::uint16);
+}
+
+TEST_F(AssociationsTest, EnumerationOfElementSettingDataEndsAtAnInterfaceWithoutDHCP) {
+    // The setting of the static interface has no endpoint: the walk ends there, and
+    // what was delivered stays.
+    const LogCapture log(6000, 6000);
+    const Host::Answer answer = host_.enumerateNames(pathOf("QVXZR_DHCPElementSettingData"));
+    EXPECT_EQ(answer.code, CMPI_RC_OK);
+    EXPECT_THAT(answer.paths, SizeIs(3));
+    ASSERT_THAT(log.log(), SizeIs(1));
+    EXPECT_THAT(log.log()[0].message,
+                ::testing::EndsWith("Could not get 'System Name' and  'Name' key"));
+}
+
+TEST_F(AssociationsTest, SettingAndAssignmentLeadToEachOther) {
+    constexpr const char* name = "QVXZR_DHCPOrderedComponent";
+    const auto setting = pathOf("QVXZR_DHCPSettingData", {{"InstanceID", "Computer%eth3"}});
+    EXPECT_EQ(briefs(host_.associators(setting, name)),
+              Texts{"IPAssignmentSettingData Computer%eth3%dhcp"});
+    const auto assignment =
+        pathOf("QVXZR_IPAssignmentSettingData", {{"InstanceID", "Computer%eth3%dhcp"}});
+    EXPECT_EQ(briefs(host_.associatorNames(assignment, name)),
+              Texts{"DHCPSettingData Computer%eth3"});
+    const Host::Answer references = host_.references(assignment, name);
+    ASSERT_THAT(references.instances, SizeIs(1));
+    EXPECT_EQ(test::numberOf(*references.instances[0], "AssignedSequence"), 1U);
+    EXPECT_EQ(references.instances[0]->property("AssignedSequence")->type, cimom::Type::uint64);
+}
+
+TEST_F(AssociationsTest, EnumeratingOrderedComponentsPlacesBothEndsByTheirPaths) {
+    constexpr const char* name = "QVXZR_DHCPOrderedComponent";
+    EXPECT_EQ(briefs(host_.enumerateNames(pathOf(name))),
+              (Texts{"DHCPOrderedComponent GroupComponent[IPAssignmentSettingData "
+                     "Computer%eth0%dhcp] PartComponent[DHCPSettingData Computer%eth0]",
+                     "DHCPOrderedComponent GroupComponent[IPAssignmentSettingData "
+                     "Computer%eth1%dhcp] PartComponent[DHCPSettingData Computer%eth1]",
+                     "DHCPOrderedComponent GroupComponent[IPAssignmentSettingData "
+                     "Computer%eth2%dhcp] PartComponent[DHCPSettingData Computer%eth2]",
+                     "DHCPOrderedComponent GroupComponent[IPAssignmentSettingData "
+                     "Computer%eth3%dhcp] PartComponent[DHCPSettingData Computer%eth3]",
+                     "DHCPOrderedComponent GroupComponent[IPAssignmentSettingData "
+                     "BMC%bmc0%dhcp] PartComponent[DHCPSettingData BMC%bmc0]"}));
+    cimom::ObjectPath narrowed = pathOf(name);
+    for (const auto& [role, path] :
+         {std::pair{"PartComponent",
+                    pathOf("QVXZR_DHCPSettingData", {{"InstanceID", "Computer%eth1"}})},
+          std::pair{"GroupComponent", pathOf("QVXZR_IPAssignmentSettingData",
+                                             {{"InstanceID", "Computer%eth1%dhcp"}})}}) {
+        cimom::Value reference;
+        reference.type = cimom::Type::reference;
+        reference.content = cimom::Scalar(std::make_shared<const cimom::ObjectPath>(path));
+        narrowed.keys.push_back({role, reference});
+    }
+    const Host::Answer got = host_.get(narrowed);
+    ASSERT_THAT(got.instances, SizeIs(1));
+    EXPECT_EQ(test::numberOf(*got.instances[0], "AssignedSequence"), 1U);
+}
+
+TEST_F(AssociationsTest, MissingAssignmentFailsWithTheComputersMessageAndStaysOk) {
+    Host withoutNeighbours;
+    const LogCapture log(6000, 6000);
+    const Host::Answer answer = withoutNeighbours.associators(
+        pathOf("QVXZR_DHCPSettingData", {{"InstanceID", "Computer%eth0"}}),
+        "QVXZR_DHCPOrderedComponent");
+    EXPECT_EQ(answer.code, CMPI_RC_OK);
+    EXPECT_THAT(answer.instances, IsEmpty());
+    EXPECT_EQ(answer.returnDoneCalls, 1U);
+    ASSERT_THAT(log.log(), SizeIs(1));
+    EXPECT_THAT(log.log()[0].message,
+                ::testing::EndsWith("Could not obtain an instance of Computer System"));
+}
+
+// Failures in one association.
+
+TEST_F(AssociationsTest, FailureInOneAssociationIsSilentForNamesAndLoggedForInstances) {
+    Host withoutNeighbours;
+    const LogCapture log(6000, 6000);
+    const Host::Answer names = withoutNeighbours.associatorNames(endpoint("eth2"), nullptr);
+    EXPECT_EQ(names.code, CMPI_RC_OK);
+    EXPECT_EQ(briefs(names), (Texts{"DHCPCapabilities eth2", "DHCPSettingData Computer%eth2"}));
+    EXPECT_EQ(names.returnDoneCalls, 1U);
+    EXPECT_THAT(log.log(), IsEmpty());
+    const Host::Answer instances = withoutNeighbours.associators(endpoint("eth2"), nullptr);
+    EXPECT_EQ(instances.code, CMPI_RC_OK);
+    EXPECT_EQ(briefs(instances), briefs(names));
+    EXPECT_THAT(log.log(), SizeIs(3));
+}
+
+TEST_F(AssociationsTest, FailureOfReferencesLeavesTheResultOpenAndIsLoggedOnceForInstances) {
+    Host withoutNeighbours;
+    const LogCapture log(6000, 6000);
+    const Host::Answer names = withoutNeighbours.referenceNames(endpoint("eth0"), hosted);
+    EXPECT_EQ(names.code, CMPI_RC_OK);
+    EXPECT_EQ(names.returnDoneCalls, 0U);
+    EXPECT_THAT(log.log(), IsEmpty());
+    const Host::Answer instances = withoutNeighbours.references(endpoint("eth0"), hosted);
+    EXPECT_EQ(instances.code, CMPI_RC_OK);
+    EXPECT_EQ(instances.returnDoneCalls, 0U);
+    EXPECT_THAT(log.log(), SizeIs(1));
+}
+
+// A source that takes no part.
+
+TEST_F(AssociationsTest, SourceOfAnotherClassHasNoAssociations) {
+    for (const char* name :
+         {"QVXZR_HostedDHCPPoint", "QVXZR_SAPSAPDependency", "QVXZR_DHCPElementCapabilities",
+          "QVXZR_DHCPRemoteHostedAccessPoint", "QVXZR_DHCPRemoteAccessAvailableToElement",
+          "QVXZR_DHCPElementSettingData", "QVXZR_DHCPOrderedComponent"}) {
+        const auto stranger = pathOf("QVXZR_SPComputerSystem", {{"Name", "BMC:-1"}});
+        for (const Host::Answer& answer :
+             {host_.associatorNames(stranger, name), host_.associators(stranger, name),
+              host_.referenceNames(stranger, name), host_.references(stranger, name)}) {
+            EXPECT_EQ(answer.code, CMPI_RC_OK) << name;
+            EXPECT_THAT(briefs(answer), IsEmpty()) << name;
+            EXPECT_EQ(answer.returnDoneCalls, 1U) << name;
+        }
+    }
+}
+
+}  // namespace

@@ -1,0 +1,230 @@
+#include "include/Trace.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <string>
+#include <string_view>
+#include <thread>
+#include <vector>
+
+#include "support/LogCapture.h"
+
+namespace ZR {
+
+namespace {
+
+using Testing::LogCapture;
+using Testing::LogRecord;
+
+constexpr MessageType unknownType = static_cast<MessageType>(4);
+constexpr const char* nullText = nullptr;
+
+TEST(Trace, TextVariableLine) {
+    EXPECT_STREQ(trace("l_cFileName", "Lindows/DHCPSettingData", 7, "/etc/ifcfg-eth0"),
+                 "VARIABLE: 'l_cFileName' has Value '/etc/ifcfg-eth0' at line 7 in "
+                 "Lindows/DHCPSettingData");
+}
+
+TEST(Trace, NumberVariableLine) {
+    EXPECT_STREQ(trace("classId", "DHCPClientProvider", 120, 85U),
+                 "VARIABLE: 'classId' has Value '85' at line 120 in DHCPClientProvider");
+}
+
+TEST(Trace, LinesOfAFunction) {
+    EXPECT_STREQ(trace("f", "g", 7, entering), "ENTERING: g() in f [Line: 7]");
+    EXPECT_STREQ(trace("f", "g", 7, exiting), "EXITING: g() in f [Line: 7]");
+    EXPECT_STREQ(trace("f", "g", 7, method), "METHOD: g() was invoked in f [Line: 7]");
+}
+
+TEST(Trace, MessageLineHasTheMessageInThePlaceOfTheFunction) {
+    EXPECT_STREQ(trace("f", "text", 7, message), "MESSAGE [File: f, Line: 7]: text");
+}
+
+TEST(Trace, LinesWithParameters) {
+    EXPECT_STREQ(tracepara("f", "g", 7, " a=1 b=2", entering),
+                 "ENTERING: g() in f [Line: 7],Parameters List:  a=1 b=2");
+    EXPECT_STREQ(tracepara("f", "g", 7, " a=1", exiting),
+                 "EXITING: g() in f [Line: 7],Parameters List:  a=1");
+    EXPECT_STREQ(tracepara("f", "g", 7, " a=1", method),
+                 "METHOD: g() was invoked in f [Line: 7],Parameters List:  a=1");
+    EXPECT_STREQ(tracepara("f", "text", 7, " a=1", message),
+                 "MESSAGE [File: f, Line: 7]: text,Parameters List:  a=1");
+}
+
+TEST(Trace, AnyOtherTypeYieldsTheEmptyText) {
+    trace("f", "g", 7, entering);  // the buffer then holds something
+    tracepara("f", "g", 7, " a=1", entering);
+    EXPECT_STREQ(trace("f", "g", 7, unknownType), "");
+    EXPECT_STREQ(tracepara("f", "g", 7, " a=1", unknownType), "");
+    EXPECT_STREQ(trace("f", "g", 7, static_cast<MessageType>(0xFFFFFFFFU)), "");
+    EXPECT_STREQ(tracepara("f", "g", 7, " a=1", static_cast<MessageType>(0xFFFFFFFFU)), "");
+}
+
+TEST(Trace, NumbersAreSignedDecimalsOf32Bits) {
+    EXPECT_STREQ(trace("v", "f", 4294967295U, 2147483648U),
+                 "VARIABLE: 'v' has Value '-2147483648' at line -1 in f");
+    EXPECT_STREQ(trace("v", "f", 0, 0U), "VARIABLE: 'v' has Value '0' at line 0 in f");
+    EXPECT_STREQ(trace("v", "f", 1, 2147483647U),
+                 "VARIABLE: 'v' has Value '2147483647' at line 1 in f");
+}
+
+TEST(Trace, NullTextsAreNamedAsSuch) {
+    EXPECT_STREQ(trace(nullText, nullText, 1, nullText),
+                 "VARIABLE: '(null)' has Value '(null)' at line 1 in (null)");
+    EXPECT_STREQ(trace(nullText, nullText, 1, 2U),
+                 "VARIABLE: '(null)' has Value '2' at line 1 in (null)");
+    EXPECT_STREQ(trace(nullText, nullText, 1, entering), "ENTERING: (null)() in (null) [Line: 1]");
+    EXPECT_STREQ(tracepara(nullText, nullText, 1, nullText, message),
+                 "MESSAGE [File: (null), Line: 1]: (null),Parameters List: (null)");
+}
+
+TEST(Trace, PercentSignsInTheTextsAreText) {
+    EXPECT_STREQ(trace("%s", "%n", 1, "Computer%eth0 %d"),
+                 "VARIABLE: '%s' has Value 'Computer%eth0 %d' at line 1 in %n");
+}
+
+TEST(Trace, LongTextsEndAfter511Characters) {
+    for (const std::size_t length : {470U, 511U, 512U, 513U, 5000U}) {
+        const std::string text(length, 'x');
+        EXPECT_EQ(trace("v", "f", 1, text.c_str()),
+                  ("VARIABLE: 'v' has Value '" + text + "' at line 1 in f").substr(0, 511));
+        EXPECT_EQ(trace(text.c_str(), "f", 1, 2U),
+                  ("VARIABLE: '" + text + "' has Value '2' at line 1 in f").substr(0, 511));
+        EXPECT_EQ(trace("f", text.c_str(), 1, message),
+                  ("MESSAGE [File: f, Line: 1]: " + text).substr(0, 511));
+        EXPECT_EQ(tracepara("f", "g", 1, text.c_str(), entering),
+                  ("ENTERING: g() in f [Line: 1],Parameters List: " + text).substr(0, 511));
+    }
+}
+
+TEST(Trace, LineOfExactly511CharactersIsWhole) {
+    const std::string frame = "MESSAGE [File: f, Line: 1]: ";
+    const std::string text(511 - frame.size(), 'x');
+    EXPECT_EQ(trace("f", text.c_str(), 1, message), frame + text);
+    EXPECT_EQ(trace("f", (text + "y").c_str(), 1, message), frame + text);
+}
+
+/// The whole buffer of a helper.
+std::string bufferOf(const char* text) {
+    return {text, traceBufferSize};
+}
+
+std::string padded(std::string_view text) {
+    std::string buffer(text);
+    buffer.resize(traceBufferSize);
+    return buffer;
+}
+
+TEST(Trace, BufferIsZeroBehindTheText) {
+    const std::string filler(600, 'x');
+    trace("v", "f", 1, filler.c_str());
+    EXPECT_EQ(bufferOf(trace("v", "f", 1, "1")),
+              padded("VARIABLE: 'v' has Value '1' at line 1 in f"));
+    trace(filler.c_str(), "f", 1, 1U);
+    EXPECT_EQ(bufferOf(trace("v", "f", 1, 1U)),
+              padded("VARIABLE: 'v' has Value '1' at line 1 in f"));
+    trace("f", filler.c_str(), 1, message);
+    EXPECT_EQ(bufferOf(trace("f", "g", 1, unknownType)), padded(""));
+    tracepara("f", "g", 1, filler.c_str(), message);
+    EXPECT_EQ(bufferOf(tracepara("f", "g", 1, "", unknownType)), padded(""));
+}
+
+TEST(Trace, TextIsValidUntilTheNextCallOfTheSameHelper) {
+    const char* const text = trace("v", "f", 1, "first");
+    const char* const number = trace("v", "f", 1, 1U);
+    const char* const plain = trace("f", "g", 1, entering);
+    const char* const withParameters = tracepara("f", "g", 1, "first", entering);
+    EXPECT_STREQ(text, "VARIABLE: 'v' has Value 'first' at line 1 in f");
+    EXPECT_STREQ(number, "VARIABLE: 'v' has Value '1' at line 1 in f");
+    EXPECT_STREQ(plain, "ENTERING: g() in f [Line: 1]");
+    EXPECT_STREQ(withParameters, "ENTERING: g() in f [Line: 1],Parameters List: first");
+
+    // The next call uses the same buffer, so a text is no one's to keep.
+    EXPECT_EQ(trace("v", "f", 2, "second"), text);
+    EXPECT_EQ(trace("v", "f", 2, 2U), number);
+    EXPECT_EQ(trace("f", "g", 2, exiting), plain);
+    EXPECT_EQ(tracepara("f", "g", 2, "second", exiting), withParameters);
+}
+
+TEST(Trace, OtherThreadsDoNotDisturbATextOfThisOne) {
+    const char* const text = trace("v", "f", 1, "mine");
+    const char* const number = trace("v", "f", 1, 1U);
+    const char* const plain = trace("f", "mine", 1, entering);
+    const char* const withParameters = tracepara("f", "g", 1, "mine", entering);
+    std::vector<std::thread> threads;
+    std::vector<unsigned char> right(4);
+    for (std::size_t id = 0; id < right.size(); ++id) {
+        threads.emplace_back([id, &right] {
+            const std::string own = "thread" + std::to_string(id);
+            bool allRight = true;
+            for (int i = 0; i < 500; ++i) {
+                allRight = allRight &&
+                           trace("v", "f", 1, own.c_str()) ==
+                               "VARIABLE: 'v' has Value '" + own + "' at line 1 in f" &&
+                           trace("f", own.c_str(), 1, method) ==
+                               "METHOD: " + own + "() was invoked in f [Line: 1]" &&
+                           tracepara("f", "g", 1, own.c_str(), exiting) ==
+                               "EXITING: g() in f [Line: 1],Parameters List: " + own;
+                trace(own.c_str(), "f", 1, 2U);
+            }
+            right[id] = allRight ? 1 : 0;
+        });
+    }
+    for (std::thread& thread : threads) {
+        thread.join();
+    }
+    EXPECT_EQ(right, (std::vector<unsigned char>(4, 1)));
+    EXPECT_STREQ(text, "VARIABLE: 'v' has Value 'mine' at line 1 in f");
+    EXPECT_STREQ(number, "VARIABLE: 'v' has Value '1' at line 1 in f");
+    EXPECT_STREQ(plain, "ENTERING: mine() in f [Line: 1]");
+    EXPECT_STREQ(withParameters, "ENTERING: g() in f [Line: 1],Parameters List: mine");
+}
+
+TEST(Trace, TextMayBeMadeOfAnEarlierOneOfAnotherHelper) {
+    EXPECT_STREQ(trace("f", trace("v", "f", 1, 2U), 3, message),
+                 "MESSAGE [File: f, Line: 3]: VARIABLE: 'v' has Value '2' at line 1 in f");
+}
+
+const std::string category = "Merrow.Test";
+const std::string separator(78, '=');
+constexpr unsigned callersLine = 17;
+
+void expectMark(const std::vector<LogRecord>& records, const char* mark, const std::string& first,
+                const std::string& second) {
+    ASSERT_EQ(records.size(), 2U);
+    const std::vector<std::string> messages{first, second};
+    for (std::size_t i = 0; i < 2; ++i) {
+        // The line is the mark's own, wherever that is.
+        EXPECT_EQ(records[i], (LogRecord{records[i].time, 4000, category, "include/Trace",
+                                         records[i].line, mark, messages[i]}));
+        EXPECT_NE(records[i].line, callersLine);
+    }
+}
+
+TEST(TraceMarks, EntryIsASeparatorAndTheEnteringLine) {
+    const LogCapture capture;
+    markProviderEntry(category, "DHCPClientProvider", "DHCPClient_GetInstance", callersLine);
+    const std::string line = "ENTERING: DHCPClient_GetInstance() in DHCPClientProvider [Line: 17]";
+    expectMark(capture.log(), "markProviderEntry", separator, line);
+    expectMark(capture.trace(), "markProviderEntry", separator, line);
+}
+
+TEST(TraceMarks, ExitIsTheExitingLineAndASeparator) {
+    const LogCapture capture;
+    markProviderExit(category, "DHCPClientProvider", "DHCPClient_GetInstance", callersLine);
+    const std::string line = "EXITING: DHCPClient_GetInstance() in DHCPClientProvider [Line: 17]";
+    expectMark(capture.log(), "markProviderExit", line, separator);
+    expectMark(capture.trace(), "markProviderExit", line, separator);
+}
+
+TEST(TraceMarks, EachRoadHasItsOwnLevel) {
+    const LogCapture capture(4001, 4000);
+    markProviderEntry(category, "f", "g", 1);
+    EXPECT_EQ(capture.log().size(), 0U);
+    EXPECT_EQ(capture.trace().size(), 2U);
+}
+
+}  // namespace
+
+}  // namespace ZR
