@@ -1,0 +1,219 @@
+// What an endpoint instance costs through the provider's function table, with
+// tracing discarded, beside the floor: the same instances made from a plain vector
+// through the same broker. Both hand their objects to a result that only counts.
+//
+// Prints Google Benchmark's figures and, below them, the ratios of the same run.
+
+#include <benchmark/benchmark.h>
+#include <unistd.h>
+
+#include <array>
+#include <cstdio>
+#include <cstdlib>
+#include <fstream>
+#include <map>
+#include <string>
+#include <vector>
+
+#include "CMPI/Host.h"
+#include "include/TracePoint.h"
+#include "providerutilities/ProviderUtilities.h"
+#include "tklogger/TKLogger.h"
+
+namespace {
+
+using ZR::ProviderUtilities;
+
+std::string treeFile;
+
+/// A machine with so many interfaces, all of which use DHCP.
+void writeTree(std::int64_t interfaces) {
+    const std::string next = treeFile + ".next";
+    std::ofstream out(next);
+    out << R"({"nodes":[{"type":"ComputerSystem","description":"Computer",)"
+        << R"("properties":{"Name":"${HOSTNAME}"},"children":[)"
+        << R"({"type":"Network","description":"Network","children":[)";
+    for (std::int64_t i = 0; i < interfaces; ++i) {
+        out << (i == 0 ? "" : ",")
+            << R"({"type":"NetworkInterface","description":"Ethernet interface","properties":{)"
+            << R"("Name":"eth)" << i << R"(","NameMaxLength":15,"DHCPEnabled":true,)"
+            << R"("AddressSource":1,"InterfaceState":1,"DHCPServerAddresses":["192.0.2.1"],)"
+            << R"("IPv4Address":"192.0.2.2"}})";
+    }
+    out << "]}]}]}";
+    out.close();
+    if (std::rename(next.c_str(), treeFile.c_str()) != 0) {
+        std::perror(treeFile.c_str());
+        std::exit(1);
+    }
+}
+
+/// A result that takes what it is given and keeps nothing of it.
+struct CountingResult {
+    std::int64_t objects = 0;
+    CMPIResult record{this, &table};
+
+    static CMPIStatus count(const CMPIResult* result) {
+        ++static_cast<CountingResult*>(result->hdl)->objects;
+        return {CMPI_RC_OK, nullptr};
+    }
+
+    static inline const CMPIResultFT table{
+        200,
+        nullptr,
+        nullptr,
+        [](const CMPIResult*, const CMPIValue*, CMPIType) { return CMPIStatus{}; },
+        [](const CMPIResult* result, const CMPIInstance*) { return count(result); },
+        [](const CMPIResult* result, const CMPIObjectPath*) { return count(result); },
+        [](const CMPIResult*) { return CMPIStatus{}; },
+        [](const CMPIResult*, const CMPIError*) { return CMPIStatus{}; }};
+};
+
+struct PlainEndpoint {
+    std::string name;
+    std::string systemName;
+};
+
+/// The floor: exactly the paths and instances that the provider makes, from facts
+/// that lie ready.
+void makePlainInstances(const CMPIBroker* broker, const std::vector<PlainEndpoint>& endpoints,
+                        const CMPIResult* result) {
+    const std::string className = "QVXZR_DHCPProtocolEndpoint";
+    const std::string systemClass = "QVXZR_ComputerSystem";
+    const std::vector<unsigned short> options{8, 14, 17};
+    for (const PlainEndpoint& endpoint : endpoints) {
+        CMPIObjectPath* path =
+            ProviderUtilities::createObjectPath(broker, className.c_str(), "root/cimv2");
+        ProviderUtilities::setKeyProperty(path, "SystemCreationClassName", systemClass);
+        ProviderUtilities::setKeyProperty(path, "SystemName", endpoint.systemName);
+        ProviderUtilities::setKeyProperty(path, "CreationClassName", className);
+        ProviderUtilities::setKeyProperty(path, "Name", endpoint.name);
+        CMPIInstance* instance = ProviderUtilities::createInstance(broker, path);
+        const auto text = [&](const char* name, const std::string& value) {
+            ProviderUtilities::setProperty(instance, name, value);
+        };
+        const auto number = [&](const char* name, unsigned short value) {
+            ProviderUtilities::setProperty(instance, name, value);
+        };
+        text("ElementName", endpoint.name);
+        number("RequestedState", 2);
+        text("SystemCreationClassName", systemClass);
+        text("SystemName", endpoint.systemName);
+        text("CreationClassName", className);
+        text("Description", "Ethernet interface");
+        number("EnabledState", 2);
+        text("Name", endpoint.name);
+        text("NameFormat", "NICName");
+        number("ProtocolIFType", 1);
+        text("OtherTypeDescription", "DHCP");
+        number("ClientState", 8);
+        ProviderUtilities::setProperty(broker, instance, "OptionsReceived", options);
+        result->ft->returnInstance(result, instance);
+    }
+}
+
+void floorOfInstances(benchmark::State& state) {
+    const test::Host host;
+    std::vector<PlainEndpoint> endpoints;
+    for (std::int64_t i = 0; i < state.range(0); ++i) {
+        endpoints.push_back({"eth" + std::to_string(i), "host.example"});
+    }
+    CountingResult result;
+    for (auto _ : state) {
+        const cimom::broker::RequestScope scope;
+        makePlainInstances(host.broker(), endpoints, &result.record);
+    }
+    state.SetItemsProcessed(result.objects);
+}
+
+void enumerate(benchmark::State& state, const char* className) {
+    writeTree(state.range(0));
+    test::Host host;
+    CountingResult result;
+    for (auto _ : state) {
+        host.request(cimom::broker::ResultCollector::Kind::instances, test::pathOf(className),
+                     [&](auto* context, auto* /*collector*/, auto* path) {
+                         return host.instanceTable().enumerateInstances(
+                             nullptr, context, &result.record, path, nullptr);
+                     });
+    }
+    state.SetItemsProcessed(result.objects);
+}
+
+const std::string loggerBenchmark = ZR::loggerCategory;
+const ZR::TraceSource source{"bench/EnumerateBenchmark", loggerBenchmark};
+
+void discardedTracePoint(benchmark::State& state) {
+    for (auto _ : state) {
+        ZR::traceVariable(ZR_HERE, "classId", 4U);
+    }
+    state.SetItemsProcessed(state.iterations());
+}
+
+/// Prints the usual figures and remembers nanoseconds per item of each.
+class RememberingReporter : public benchmark::ConsoleReporter {
+  public:
+    void ReportRuns(const std::vector<Run>& runs) override {
+        ConsoleReporter::ReportRuns(runs);
+        for (const Run& run : runs) {
+            const auto rate = run.counters.find("items_per_second");
+            if (rate != run.counters.end() && rate->second.value > 0) {
+                nanoseconds[run.benchmark_name()] = 1e9 / rate->second.value;
+            }
+        }
+    }
+
+    std::map<std::string, double> nanoseconds;
+};
+
+void printRatios(const std::map<std::string, double>& nanoseconds) {
+    std::printf("\n%-24s %14s %14s %8s\n", "endpoints", "instance [ns]", "floor [ns]", "ratio");
+    for (const char* count : {"1", "100", "1000"}) {
+        const auto instance = nanoseconds.find(std::string("QVXZR_DHCPProtocolEndpoint/") + count);
+        const auto floor = nanoseconds.find(std::string("floor/") + count);
+        if (instance != nanoseconds.end() && floor != nanoseconds.end()) {
+            std::printf("%-24s %14.0f %14.0f %8.2f\n", count, instance->second, floor->second,
+                        instance->second / floor->second);
+        }
+    }
+    const auto trace = nanoseconds.find("discarded trace point");
+    if (trace != nanoseconds.end()) {
+        std::printf("%-24s %14.1f\n", "discarded trace point", trace->second);
+    }
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+    std::array<char, 32> directory{"/tmp/provider-bench-XXXXXX"};
+    if (::mkdtemp(directory.data()) == nullptr) {
+        std::perror("mkdtemp");
+        return 1;
+    }
+    treeFile = std::string(directory.data()) + "/tree.json";
+    ::setenv("ZR_INSTRUMENTATION_TREE", treeFile.c_str(), 1);
+    ::setenv("ZR_LOG_SINK", "none", 1);
+    ::setenv("ZR_TRACE_SINK", "none", 1);
+    ::setenv("ZR_DATA_DIR", directory.data(), 1);
+
+    benchmark::RegisterBenchmark("discarded trace point", discardedTracePoint);
+    benchmark::RegisterBenchmark("floor", floorOfInstances)->Arg(1)->Arg(100)->Arg(1000);
+    for (const char* className : {"QVXZR_DHCPProtocolEndpoint", "QVXZR_DHCPCapabilities",
+                                  "QVXZR_DHCPSettingData", "QVXZR_DHCPRemoteServiceAccessPoint"}) {
+        benchmark::RegisterBenchmark(
+            className, [className](benchmark::State& state) { enumerate(state, className); })
+            ->Arg(1)
+            ->Arg(100)
+            ->Arg(1000);
+    }
+    benchmark::Initialize(&argc, argv);
+    if (benchmark::ReportUnrecognizedArguments(argc, argv)) {
+        return 2;
+    }
+    RememberingReporter reporter;
+    benchmark::RunSpecifiedBenchmarks(&reporter);
+    printRatios(reporter.nanoseconds);
+    std::remove(treeFile.c_str());
+    ::rmdir(directory.data());
+    return 0;
+}

@@ -1,0 +1,106 @@
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <variant>
+#include <vector>
+
+namespace cimdhcp {
+
+enum class Format : std::uint8_t { table, mof, json };
+
+/// What holds for every command.
+struct Options {
+    std::optional<std::string> tree;     ///< a JSON tree in place of the live machine
+    std::optional<std::string> dataDir;  ///< where the ifcfg- files are
+    std::string nameSpace = "root/cimv2";
+    Format format = Format::table;
+    std::optional<std::string> schemaDir;
+    std::optional<std::string> registrationDir;
+    std::optional<std::string> providerDir;
+
+    bool operator==(const Options&) const = default;
+};
+
+struct ShowCommand {
+    bool operator==(const ShowCommand&) const = default;
+};
+struct RenameCommand {
+    std::string interfaceName;
+    std::string name;
+    bool create = false;
+
+    bool operator==(const RenameCommand&) const = default;
+};
+struct TreeCommand {
+    bool operator==(const TreeCommand&) const = default;
+};
+struct ClassesCommand {
+    bool operator==(const ClassesCommand&) const = default;
+};
+struct NamesCommand {
+    std::string className;
+
+    bool operator==(const NamesCommand&) const = default;
+};
+struct InstancesCommand {
+    std::string className;
+
+    bool operator==(const InstancesCommand&) const = default;
+};
+struct GetCommand {
+    std::string path;
+
+    bool operator==(const GetCommand&) const = default;
+};
+struct ModifyCommand {
+    std::string path;
+    std::vector<std::string> assignments;  ///< PROPERTY=VALUE
+
+    bool operator==(const ModifyCommand&) const = default;
+};
+struct AssociatorsCommand {
+    std::string path;
+    bool names = false;
+    std::optional<std::string> assocClass;
+    std::optional<std::string> resultClass;
+    std::optional<std::string> role;
+    std::optional<std::string> resultRole;
+
+    bool operator==(const AssociatorsCommand&) const = default;
+};
+struct ReferencesCommand {
+    std::string path;
+    bool names = false;
+    std::optional<std::string> resultClass;
+    std::optional<std::string> role;
+
+    bool operator==(const ReferencesCommand&) const = default;
+};
+
+using Command = std::variant<ShowCommand, RenameCommand, TreeCommand, ClassesCommand, NamesCommand,
+                             InstancesCommand, GetCommand, ModifyCommand, AssociatorsCommand,
+                             ReferencesCommand>;
+
+struct CommandLine {
+    Options options;
+    Command command;
+
+    bool operator==(const CommandLine&) const = default;
+};
+
+/// A text that the person asked for: the help or the version.
+struct Information {
+    std::string text;
+
+    bool operator==(const Information&) const = default;
+};
+
+/// Reads the arguments behind the program's name. The environment is looked at
+/// for CIMDHCP_SCHEMA_DIR, CIMDHCP_REGISTRATION_DIR and CIMDHCP_PROVIDER_DIR.
+/// Throws Failure with ExitStatus::usage.
+[[nodiscard]] std::variant<CommandLine, Information> readCommandLine(
+    const std::vector<std::string>& arguments);
+
+}  // namespace cimdhcp

@@ -1,0 +1,22 @@
+#pragma once
+
+#include <cstddef>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "cimdhcp/MachineOverview.h"
+
+namespace cimdhcp {
+
+/// The interfaces as a table, with a line below it when none of them uses DHCP;
+/// that line alone when there are none. The system stands in a column of its own
+/// when not all of them are the host's.
+[[nodiscard]] std::string overviewTable(const std::vector<InterfaceOverview>& interfaces,
+                                        std::optional<std::size_t> width);
+
+/// {"interfaces": [{"interface", "system", "dhcp", "state", "address", "servers",
+/// "configurationName"}]}; what is not known is null.
+[[nodiscard]] std::string overviewJson(const std::vector<InterfaceOverview>& interfaces);
+
+}  // namespace cimdhcp

@@ -1,0 +1,36 @@
+#pragma once
+
+#include <string>
+
+#include "cimdhcp/Client.h"
+#include "cimdhcp/CommandLine.h"
+
+namespace cimdhcp {
+
+/// What a rename did.
+struct RenameReport {
+    std::string interfaceName;
+    std::string file;  ///< the interface's configuration file
+    std::string dataDir;
+    bool directoryCreated = false;
+    bool fileCreated = false;
+    std::string oldName;  ///< empty: it had none
+    std::string newName;
+
+    bool operator==(const RenameReport&) const = default;
+};
+
+/// Changes the configuration name of an interface through the provider, and reads
+/// it back: what it answers has happened. `dataDir` ends with "/". The interface may
+/// be given as the setting's InstanceID ("BMC%eth1"), too, which tells interfaces of
+/// one name apart. Throws Failure.
+[[nodiscard]] RenameReport rename(const RenameCommand& command, const std::string& dataDir,
+                                  Client& client);
+
+[[nodiscard]] std::string renameText(const RenameReport& report);
+
+/// {"operation": "rename", "interface", "file", "fileCreated", "directoryCreated",
+/// "oldName", "newName"}; an old name that there was not is null.
+[[nodiscard]] std::string renameJson(const RenameReport& report);
+
+}  // namespace cimdhcp

@@ -1,0 +1,14 @@
+#pragma once
+
+#include <cstddef>
+#include <optional>
+
+namespace cimdhcp {
+
+/// How many columns there are to write in: none when the descriptor is no
+/// terminal, since what goes into a pipe or a file is never cut. On a terminal
+/// `columns` (the variable COLUMNS, null when not set) counts first, then what the
+/// terminal says, then 80.
+[[nodiscard]] std::optional<std::size_t> terminalWidth(int descriptor, const char* columns);
+
+}  // namespace cimdhcp

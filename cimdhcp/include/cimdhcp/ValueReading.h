@@ -1,0 +1,17 @@
+#pragma once
+
+#include <string_view>
+
+#include "cimom/Cim.h"
+#include "cimom/ClassRepository.h"
+
+namespace cimdhcp {
+
+/// Reads what a person typed as the value of a property. A text is taken as it is;
+/// numbers, TRUE, FALSE, datetimes and object paths by their type; an array as
+/// {value, value...} with its texts in double quotes. NULL is no value, other than
+/// for a text. Throws Failure with what the property would take.
+[[nodiscard]] cimom::Value readValue(const cimom::PropertyDeclaration& property,
+                                     std::string_view text);
+
+}  // namespace cimdhcp

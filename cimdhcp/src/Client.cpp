@@ -1,0 +1,107 @@
+#include "cimdhcp/Client.h"
+
+#include <algorithm>
+#include <utility>
+
+#include "cimdhcp/DisplayText.h"
+#include "cimdhcp/StatusMessage.h"
+
+namespace cimdhcp {
+
+namespace {
+
+Answer answerOf(const char* operation, cimom::PathsResult result) {
+    return {
+        operation, std::move(result.status), result.returnDoneCalls, std::move(result.paths), {}};
+}
+
+Answer answerOf(const char* operation, cimom::InstancesResult result) {
+    return {operation,
+            std::move(result.status),
+            result.returnDoneCalls,
+            {},
+            std::move(result.instances)};
+}
+
+}  // namespace
+
+Client::Client(const Directories& directories, std::string nameSpace)
+    : nameSpace_(std::move(nameSpace)) {
+    cimom::Configuration configuration;
+    configuration.schemaDirectories = {directories.schema};
+    configuration.registrationFiles = registrationFiles(directories.registrations);
+    configuration.providerDirectories = directories.providers;
+    try {
+        manager_.emplace(std::move(configuration));
+    } catch (const cimom::MofError& error) {
+        throw Failure(ExitStatus::notLoaded, printable(error.what()));
+    } catch (const cimom::LoadError& error) {
+        throw Failure(ExitStatus::notLoaded, printable(error.what()));
+    }
+}
+
+const cimom::ClassRepository& Client::repository() const noexcept {
+    return manager_->repository();
+}
+
+const std::vector<cimom::Registration>& Client::registrations() const noexcept {
+    return manager_->registrations();
+}
+
+cimom::ObjectPath Client::classPath(const std::string& className) const {
+    return {"", nameSpace_, className, {}};
+}
+
+Answer Client::enumerateNames(const cimom::ObjectPath& path) {
+    return answerOf("EnumerateInstanceNames", manager_->enumerateInstanceNames(path));
+}
+
+Answer Client::enumerate(const cimom::ObjectPath& path) {
+    return answerOf("EnumerateInstances", manager_->enumerateInstances(path));
+}
+
+Answer Client::get(const cimom::ObjectPath& path) {
+    return answerOf("GetInstance", manager_->getInstance(path));
+}
+
+Answer Client::modify(const cimom::Instance& instance) {
+    cimom::InstanceRequest request;
+    request.propertyList.emplace();
+    for (const cimom::NamedValue& property : instance.properties) {
+        request.propertyList->push_back(property.name);
+    }
+    return answerOf("ModifyInstance", manager_->modifyInstance(instance, request));
+}
+
+Answer Client::associatorNames(const cimom::ObjectPath& path,
+                               const cimom::AssociationRequest& request) {
+    return answerOf("AssociatorNames", manager_->associatorNames(path, request));
+}
+
+Answer Client::associators(const cimom::ObjectPath& path,
+                           const cimom::AssociationRequest& request) {
+    return answerOf("Associators", manager_->associators(path, request));
+}
+
+Answer Client::referenceNames(const cimom::ObjectPath& path,
+                              const cimom::AssociationRequest& request) {
+    return answerOf("ReferenceNames", manager_->referenceNames(path, request));
+}
+
+Answer Client::references(const cimom::ObjectPath& path, const cimom::AssociationRequest& request) {
+    return answerOf("References", manager_->references(path, request));
+}
+
+Failure Client::failure(const Answer& answer, const cimom::ObjectPath& asked) const {
+    // The object manager has no status of its own for a library that it cannot
+    // load; it begins such a message with the library's file.
+    const bool notLoaded = std::any_of(
+        registrations().begin(), registrations().end(),
+        [&answer](const cimom::Registration& registration) {
+            return answer.status.message.find("lib" + registration.location + ".so: ") !=
+                   std::string::npos;
+        });
+    return {notLoaded ? ExitStatus::notLoaded : ExitStatus::notDone, statusMessage(answer, asked)};
+}
+
+}  // namespace cimdhcp

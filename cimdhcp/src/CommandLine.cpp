@@ -1,0 +1,266 @@
+#include "cimdhcp/CommandLine.h"
+
+#include <CLI/CLI.hpp>
+#include <map>
+#include <memory>
+
+#include "cimdhcp/DisplayText.h"
+#include "cimdhcp/Failure.h"
+#include "cimdhcp/HelpFormatter.h"
+
+namespace cimdhcp {
+
+namespace {
+
+constexpr const char* description =
+    "Shows and changes how the network interfaces of this machine use DHCP.\n"
+    "Everything is asked of the CIM provider of the machine's DHCP clients, in this\n"
+    "process: no object manager has to be installed or running.";
+
+constexpr const char* pathHelp =
+    "PATH names an instance as CLASS.KEY=\"VALUE\"[,KEY=\"VALUE\"...]; a namespace and a\n"
+    "colon may stand before it. Put it in single quotes for the shell, as in\n"
+    "  'QVXZR_DHCPSettingData.InstanceID=\"Computer%eth0\"'";
+
+constexpr const char* footer = R"(
+Examples:
+  cimdhcp show
+  cimdhcp rename eth0 office
+  cimdhcp instances QVXZR_DHCPProtocolEndpoint
+  cimdhcp get 'QVXZR_DHCPSettingData.InstanceID="Computer%eth0"'
+  cimdhcp --format json associators --names 'QVXZR_DHCPCapabilities.InstanceID="eth0"'
+  cimdhcp --tree machine.json show
+
+Exit status:
+  0  done
+  1  the answer is another CIM status than OK (its name is on standard error), or
+     a rename was not possible
+  2  the command line cannot be understood
+  3  the provider or a file cannot be loaded, or the output cannot be written
+
+Schema, registrations and providers are those that are installed with the program,
+unless an advanced option or one of the environment variables CIMDHCP_SCHEMA_DIR,
+CIMDHCP_REGISTRATION_DIR and CIMDHCP_PROVIDER_DIR names others.
+
+"cimdhcp COMMAND --help" tells more about a command. The options above may stand
+before or behind the command.)";
+
+constexpr const char* machineGroup = "The machine";
+constexpr const char* classGroup = "Classes and instances";
+constexpr const char* associationGroup = "Associations";
+constexpr const char* advancedGroup = "Advanced options";
+
+/// The options of a command line while they are being read.
+class Reader {
+  public:
+    Reader() : app_(description, "cimdhcp") {
+        app_.formatter(std::make_shared<HelpFormatter>());
+        app_.set_version_flag("--version", "cimdhcp " CIMDHCP_VERSION, "Print the version");
+        app_.set_help_flag("-h,--help", "Print this help");
+        // Options may stand behind the command, too.
+        app_.fallthrough();
+        // One at most; that there is one is checked below, in better words.
+        app_.require_subcommand(0, 1);
+        addOptions();
+        addMachineCommands();
+        addInstanceCommands();
+        addAssociationCommands();
+        // Commands made after this would take the footer over.
+        app_.footer(std::string(pathHelp) + '\n' + footer);
+    }
+
+    std::variant<CommandLine, Information> read(const std::vector<std::string>& arguments) {
+        try {
+            // The parser takes them from the end.
+            app_.parse(std::vector<std::string>(arguments.rbegin(), arguments.rend()));
+        } catch (const CLI::CallForHelp&) {
+            return Information{app_.help()};
+        } catch (const CLI::CallForVersion& version) {
+            return Information{std::string(version.what()) + '\n'};
+        } catch (const CLI::ParseError& error) {
+            refuse(reasonOf(error));
+        }
+        if (app_.get_subcommands().empty()) {
+            refuse("a command is missing");
+        }
+        normalize();
+        return line_;
+    }
+
+  private:
+    [[noreturn]] static void refuse(const std::string& reason) {
+        throw Failure(ExitStatus::usage, reason + " (\"cimdhcp --help\" tells more)");
+    }
+
+    [[nodiscard]] std::string reasonOf(const CLI::ParseError& error) const {
+        const bool extra = dynamic_cast<const CLI::ExtrasError*>(&error) != nullptr;
+        const std::vector<std::string> rest = app_.remaining();
+        if (extra && app_.get_subcommands().empty() && !rest.empty() &&
+            !rest.front().starts_with('-')) {
+            return "there is no command \"" + printable(rest.front()) + '"';
+        }
+        return printable(error.what());
+    }
+
+    void addOptions() {
+        app_.add_option("--tree", line_.options.tree, "A JSON tree in place of the live machine")
+            ->type_name("FILE");
+        app_.add_option("--data-dir", line_.options.dataDir,
+                        "Directory of the ifcfg-INTERFACE files")
+            ->type_name("DIR");
+        app_.add_option("--namespace", line_.options.nameSpace,
+                        "The CIM namespace; root/cimv2 if none is given")
+            ->type_name("NS");
+        const std::map<std::string, Format> formats{
+            {"table", Format::table}, {"mof", Format::mof}, {"json", Format::json}};
+        app_.add_option_function<std::string>(
+                "--format",
+                [this, formats](const std::string& name) {
+                    line_.options.format = formats.at(name);
+                },
+                "table (the default), mof or json")
+            ->type_name("FORMAT")
+            ->check([formats](const std::string& name) {
+                return formats.contains(name)
+                           ? std::string()
+                           : "there is no format \"" + name + "\", only table, mof and json";
+            });
+        app_.add_option("--schema-dir", line_.options.schemaDir, "Directory of the *.mof files")
+            ->type_name("DIR")
+            ->envname("CIMDHCP_SCHEMA_DIR")
+            ->group(advancedGroup);
+        app_.add_option("--registration-dir", line_.options.registrationDir,
+                        "Directory of the *.registration files")
+            ->type_name("DIR")
+            ->envname("CIMDHCP_REGISTRATION_DIR")
+            ->group(advancedGroup);
+        app_.add_option("--provider-dir", line_.options.providerDir,
+                        "Directory of the provider libraries")
+            ->type_name("DIR")
+            ->envname("CIMDHCP_PROVIDER_DIR")
+            ->group(advancedGroup);
+    }
+
+    /// A command whose arguments are read into a record of its own.
+    template <typename Record>
+    CLI::App* command(const char* name, const char* group, const std::string& text,
+                      Record& record) {
+        CLI::App* const app = app_.add_subcommand(name, text);
+        app->group(group);
+        app->callback([this, &record] { line_.command = record; });
+        return app;
+    }
+
+    void addMachineCommands() {
+        command("show", machineGroup, "The network interfaces and their DHCP clients", show_);
+        CLI::App* const rename =
+            command("rename", machineGroup, "Change an interface's configuration name", rename_);
+        rename->add_option("INTERFACE", rename_.interfaceName, "The interface, such as eth0")
+            ->required();
+        rename->add_option("NAME", rename_.name, "The new configuration name")->required();
+        rename->add_flag("--create", rename_.create,
+                         "Make the interface's configuration file if there is none");
+        command("tree", machineGroup, "What is known of the machine, as a JSON tree", tree_);
+    }
+
+    void addInstanceCommands() {
+        command("classes", classGroup, "The served classes", classes_);
+        CLI::App* const names =
+            command("names", classGroup, "The paths of a class' instances", names_);
+        names->add_option("CLASS", names_.className, "The class, or a parent of it")->required();
+        CLI::App* const instances =
+            command("instances", classGroup, "The instances of a class", instances_);
+        instances->add_option("CLASS", instances_.className, "The class, or a parent of it")
+            ->required();
+        CLI::App* const get = command("get", classGroup, "One instance", get_);
+        addPath(get, get_.path);
+        CLI::App* const modify =
+            command("modify", classGroup, "Change properties of an instance", modify_);
+        addPath(modify, modify_.path);
+        modify
+            ->add_option("PROPERTY=VALUE", modify_.assignments,
+                         "What to change; an array is {VALUE, VALUE...}")
+            ->required();
+    }
+
+    void addAssociationCommands() {
+        CLI::App* const associators = command("associators", associationGroup,
+                                              "What is associated with an instance", associators_);
+        addPath(associators, associators_.path);
+        associators->add_flag("--names", associators_.names, "Their paths alone");
+        addFilter(associators, "--assoc-class", associators_.assocClass, "CLASS",
+                  "Through associations of this class only");
+        addFilter(associators, "--result-class", associators_.resultClass, "CLASS",
+                  "Instances of this class only");
+        addFilter(associators, "--role", associators_.role, "PROPERTY",
+                  "Only where PATH stands in this reference");
+        addFilter(associators, "--result-role", associators_.resultRole, "PROPERTY",
+                  "Only what stands in this reference");
+        CLI::App* const references =
+            command("references", associationGroup, "The associations of an instance", references_);
+        addPath(references, references_.path);
+        references->add_flag("--names", references_.names, "Their paths alone");
+        addFilter(references, "--result-class", references_.resultClass, "CLASS",
+                  "Associations of this class only");
+        addFilter(references, "--role", references_.role, "PROPERTY",
+                  "Only where PATH stands in this reference");
+    }
+
+    static void addPath(CLI::App* app, std::string& path) {
+        app->add_option("PATH", path, "The instance")->required();
+        app->footer(pathHelp);
+    }
+
+    static void addFilter(CLI::App* app, const char* option, std::optional<std::string>& value,
+                          const char* type, const char* text) {
+        app->add_option(option, value, text)->type_name(type);
+    }
+
+    void normalize() {
+        Options& options = line_.options;
+        std::string& nameSpace = options.nameSpace;
+        nameSpace.erase(0, nameSpace.find_first_not_of('/'));
+        nameSpace.erase(nameSpace.find_last_not_of('/') + 1);
+        if (nameSpace.empty()) {
+            throw Failure(ExitStatus::usage, "--namespace needs a name, such as root/cimv2");
+        }
+        for (const auto& [name, value] :
+             {std::pair{"--tree", &options.tree}, std::pair{"--data-dir", &options.dataDir}}) {
+            if (*value && (*value)->empty()) {
+                throw Failure(ExitStatus::usage, std::string(name) + " needs a name");
+            }
+        }
+        if (options.format == Format::mof && !hasMofForm()) {
+            throw Failure(ExitStatus::usage,
+                          "this command has no MOF output; use --format table or json");
+        }
+    }
+
+    [[nodiscard]] bool hasMofForm() const {
+        return !std::holds_alternative<ShowCommand>(line_.command) &&
+               !std::holds_alternative<RenameCommand>(line_.command) &&
+               !std::holds_alternative<TreeCommand>(line_.command) &&
+               !std::holds_alternative<ClassesCommand>(line_.command);
+    }
+
+    CommandLine line_;
+    ShowCommand show_;
+    RenameCommand rename_;
+    TreeCommand tree_;
+    ClassesCommand classes_;
+    NamesCommand names_;
+    InstancesCommand instances_;
+    GetCommand get_;
+    ModifyCommand modify_;
+    AssociatorsCommand associators_;
+    ReferencesCommand references_;
+    CLI::App app_;
+};
+
+}  // namespace
+
+std::variant<CommandLine, Information> readCommandLine(const std::vector<std::string>& arguments) {
+    return Reader().read(arguments);
+}
+
+}  // namespace cimdhcp

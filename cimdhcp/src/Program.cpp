@@ -1,0 +1,131 @@
+#include "cimdhcp/Program.h"
+
+#include <exception>
+#include <ostream>
+#include <type_traits>
+#include <variant>
+
+#include "cimdhcp/CimCommands.h"
+#include "cimdhcp/ClassList.h"
+#include "cimdhcp/Client.h"
+#include "cimdhcp/CommandLine.h"
+#include "cimdhcp/Directories.h"
+#include "cimdhcp/Failure.h"
+#include "cimdhcp/JsonFormat.h"
+#include "cimdhcp/MachineOverview.h"
+#include "cimdhcp/MofFormat.h"
+#include "cimdhcp/Overview.h"
+#include "cimdhcp/PlatformSetup.h"
+#include "cimdhcp/Rename.h"
+#include "cimdhcp/TableFormat.h"
+#include "zrclient/InstrumentationService.h"
+#include "zrclient/SnapshotJson.h"
+#include "zrcommon/PlatformUtilities.h"
+
+namespace cimdhcp {
+
+namespace {
+
+/// Runs one command line.
+class Execution {
+  public:
+    Execution(const Options& options, const Outputs& outputs)
+        : options_(options), outputs_(outputs) {}
+
+    void operator()(const ShowCommand& /*command*/) const {
+        Client client = openClient();
+        const ServedInstances served = askProvider(client);
+        auto interfaces = interfacesOf(*ZR::InstrumentationService::process().current());
+        addServed(served, client.repository(), interfaces);
+        outputs_.out << (json() ? overviewJson(interfaces)
+                                : overviewTable(interfaces, outputs_.width));
+    }
+
+    void operator()(const RenameCommand& command) const {
+        Client client = openClient();
+        const RenameReport report =
+            rename(command, ZR::PlatformUtilities::getKestraDataDir(), client);
+        outputs_.out << (json() ? renameJson(report) : renameText(report));
+    }
+
+    void operator()(const TreeCommand& /*command*/) const {
+        outputs_.out << ZR::toJson(*ZR::InstrumentationService::process().current());
+    }
+
+    void operator()(const ClassesCommand& /*command*/) const {
+        const Client client = openClient();
+        const auto classes = servedClasses(client.registrations(), client.repository());
+        outputs_.out << (json() ? classJson(classes) : classTable(classes, outputs_.width));
+    }
+
+    template <typename CimCommand>
+    void operator()(const CimCommand& command) const {
+        Client client = openClient();
+        const Request request = carryOut(command, client);
+        outputs_.out << formatted(request.answer, client);
+        if (!request.answer.status.ok()) {
+            throw client.failure(request.answer, request.asked);
+        }
+        if (std::is_same_v<CimCommand, ModifyCommand> && options_.format == Format::table) {
+            outputs_.out << "Modified.\n";
+        }
+    }
+
+  private:
+    [[nodiscard]] bool json() const { return options_.format == Format::json; }
+
+    [[nodiscard]] Client openClient() const {
+        return Client(findDirectories(options_, installations(executableFile())),
+                      options_.nameSpace);
+    }
+
+    [[nodiscard]] std::string formatted(const Answer& answer, const Client& client) const {
+        switch (options_.format) {
+            case Format::json:
+                return asJson(answer);
+            case Format::mof:
+                return asMof(answer, client.repository());
+            case Format::table:
+                break;
+        }
+        return asTable(answer, client.repository(), outputs_.width);
+    }
+
+    const Options& options_;
+    const Outputs& outputs_;
+};
+
+void runCommand(const std::vector<std::string>& arguments, const Outputs& outputs) {
+    const auto parsed = readCommandLine(arguments);
+    if (const auto* const information = std::get_if<Information>(&parsed)) {
+        outputs.out << information->text;
+    } else {
+        const auto& line = std::get<CommandLine>(parsed);
+        setUpPlatform(line.options, outputs.err);
+        std::visit(Execution(line.options, outputs), line.command);
+    }
+}
+
+}  // namespace
+
+int run(const std::vector<std::string>& arguments, const Outputs& outputs) noexcept {
+    ExitStatus status = ExitStatus::ok;
+    const auto complain = [&](ExitStatus reason, const char* message) {
+        status = reason;
+        outputs.err << "cimdhcp: " << message << '\n';
+    };
+    try {
+        runCommand(arguments, outputs);
+    } catch (const Failure& failure) {
+        complain(failure.status(), failure.what());
+    } catch (const std::exception& exception) {
+        complain(ExitStatus::notLoaded, exception.what());
+    }
+    // What has been printed before a failure is to come out, too.
+    if (!outputs.out.flush() && status == ExitStatus::ok) {
+        complain(ExitStatus::notLoaded, "the output cannot be written");
+    }
+    return static_cast<int>(status);
+}
+
+}  // namespace cimdhcp

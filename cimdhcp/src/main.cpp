@@ -1,0 +1,13 @@
+#include <unistd.h>
+
+#include <cstdlib>
+#include <iostream>
+
+#include "cimdhcp/Program.h"
+#include "cimdhcp/Terminal.h"
+
+int main(int argc, char** argv) {
+    const std::vector<std::string> arguments(argv + (argc > 0 ? 1 : 0), argv + argc);
+    const auto width = cimdhcp::terminalWidth(STDOUT_FILENO, std::getenv("COLUMNS"));
+    return cimdhcp::run(arguments, {std::cout, std::cerr, width});
+}

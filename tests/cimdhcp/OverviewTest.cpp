@@ -1,0 +1,78 @@
+#include "cimdhcp/Overview.h"
+
+#include <gtest/gtest.h>
+
+namespace cimdhcp {
+namespace {
+
+const InterfaceOverview bound{
+    "Computer", "eth0", true, "bound", "192.0.2.17", {"192.0.2.1", "2001:db8::1"}, "office"};
+const InterfaceOverview fixed{"Computer", "eth1", false, "active", "198.51.100.4", {}, ""};
+const InterfaceOverview untold{"Computer", "eth2", std::nullopt, "", "", {}, ""};
+const InterfaceOverview ofProcessor{"BMC", "eth0", true, "disabled", "", {}, ""};
+
+TEST(Overview, IsATable) {
+    EXPECT_EQ(overviewTable({bound, fixed, untold}, std::nullopt),
+              "INTERFACE  DHCP  STATE   ADDRESS       SERVERS                 CONFIGURATION NAME\n"
+              "eth0       on    bound   192.0.2.17    192.0.2.1, 2001:db8::1  office\n"
+              "eth1       off   active  198.51.100.4  -                       -\n"
+              "eth2       -     -       -             -                       -\n");
+}
+
+TEST(Overview, HasTheSystemWhereThereAreTwo) {
+    EXPECT_EQ(overviewTable({fixed, ofProcessor}, std::nullopt),
+              "SYSTEM    INTERFACE  DHCP  STATE     ADDRESS       SERVERS  CONFIGURATION NAME\n"
+              "Computer  eth1       off   active    198.51.100.4  -        -\n"
+              "BMC       eth0       on    disabled  -             -        -\n");
+}
+
+TEST(Overview, SaysThatNoInterfaceUsesDhcp) {
+    EXPECT_EQ(overviewTable({fixed}, std::nullopt),
+              "INTERFACE  DHCP  STATE   ADDRESS       SERVERS  CONFIGURATION NAME\n"
+              "eth1       off   active  198.51.100.4  -        -\n"
+              "No interface of this machine uses DHCP.\n");
+    // It would be a guess when the provider did not tell.
+    EXPECT_EQ(overviewTable({untold}, std::nullopt).find("No interface"), std::string::npos);
+}
+
+TEST(Overview, SaysThatThereAreNoInterfaces) {
+    EXPECT_EQ(overviewTable({}, std::nullopt), "This machine has no network interfaces.\n");
+}
+
+TEST(Overview, FitsATerminal) {
+    EXPECT_EQ(overviewTable({bound}, 60),
+              "INTERFACE  DHCP  STATE  ADDRESS     SERVERS      CONFIGURAT…\n"
+              "eth0       on    bound  192.0.2.17  192.0.2.1,…  office\n");
+}
+
+TEST(Overview, IsJson) {
+    EXPECT_EQ(overviewJson({bound, untold}), R"({
+  "interfaces": [
+    {
+      "interface": "eth0",
+      "system": "Computer",
+      "dhcp": true,
+      "state": "bound",
+      "address": "192.0.2.17",
+      "servers": [
+        "192.0.2.1",
+        "2001:db8::1"
+      ],
+      "configurationName": "office"
+    },
+    {
+      "interface": "eth2",
+      "system": "Computer",
+      "dhcp": null,
+      "state": null,
+      "address": null,
+      "servers": [],
+      "configurationName": null
+    }
+  ]
+}
+)");
+}
+
+}  // namespace
+}  // namespace cimdhcp

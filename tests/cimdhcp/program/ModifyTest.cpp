@@ -1,0 +1,82 @@
+#include <gtest/gtest.h>
+
+#include <nlohmann/json.hpp>
+
+#include "ProgramRun.h"
+
+namespace {
+
+using test::Ended;
+using ZR::Testing::readFile;
+
+const std::string setting = "QVXZR_DHCPSettingData.InstanceID=\"Computer%eth0\"";
+
+class Modify : public test::ProgramTest {};
+
+TEST_F(Modify, ChangesTheConfigurationName) {
+    writeConfiguration("eth0", "DEVICE=eth0\nCONFIG_NAME=home\n");
+    EXPECT_EQ(run({"modify", setting, "configurationname=a=b c"}), (Ended{0, "Modified.\n", ""}));
+    EXPECT_EQ(readFile(configuration("eth0")), "DEVICE=eth0\nCONFIG_NAME=a=b c\n");
+}
+
+TEST_F(Modify, IsQuietInOtherFormats) {
+    writeConfiguration("eth0", "CONFIG_NAME=home\n");
+    EXPECT_EQ(run({"--format", "mof", "modify", setting, "ConfigurationName=x"}),
+              (Ended{0, "", ""}));
+    EXPECT_EQ(run({"--format", "json", "modify", setting, "ConfigurationName=y"}), (Ended{0, R"({
+  "operation": "ModifyInstance",
+  "status": {
+    "code": 0,
+    "name": "OK"
+  },
+  "returnDone": 1,
+  "paths": [],
+  "instances": []
+}
+)",
+                                                                                          ""}));
+    EXPECT_EQ(readFile(configuration("eth0")), "CONFIG_NAME=y\n");
+}
+
+TEST_F(Modify, TellsWhatAPropertyTakes) {
+    EXPECT_EQ(run({"modify", setting, "AddressOrigin=fixed"}),
+              (Ended{2, "",
+                     "cimdhcp: AddressOrigin cannot be \"fixed\": it takes a number from 0 to "
+                     "65535\n"}));
+    EXPECT_EQ(
+        run({"modify", setting, "ConfigurationName"}),
+        (Ended{2, "",
+               "cimdhcp: \"ConfigurationName\" is no assignment of the form PROPERTY=VALUE\n"}));
+    EXPECT_EQ(run({"modify", setting, "ElementName=a", "elementname=b"}),
+              (Ended{2, "", "cimdhcp: elementname is given twice\n"}));
+}
+
+TEST_F(Modify, RefusesPropertiesThatTheClassDoesNotHave) {
+    EXPECT_EQ(run({"modify", setting, "Colour=red"}),
+              (Ended{1, "",
+                     "cimdhcp: CIM_ERR_NO_SUCH_PROPERTY: QVXZR_DHCPSettingData has no property "
+                     "\"Colour\"\n"}));
+}
+
+TEST_F(Modify, IsRefusedByClassesThatCannotBeChanged) {
+    EXPECT_EQ(run({"modify", "QVXZR_DHCPCapabilities.InstanceID=\"eth0\"", "MaxElementNameLen=4"}),
+              (Ended{1, "",
+                     "cimdhcp: CIM_ERR_NOT_SUPPORTED: ModifyInstance of QVXZR_DHCPCapabilities is "
+                     "not supported\n"}));
+}
+
+TEST_F(Modify, NeedsAnInstance) {
+    writeConfiguration("eth0", "CONFIG_NAME=home\n");
+    EXPECT_EQ(run({"modify", "QVXZR_DHCPSettingData", "ConfigurationName=x"}).status, 2);
+    EXPECT_EQ(readFile(configuration("eth0")), "CONFIG_NAME=home\n");
+}
+
+TEST_F(Modify, RefusesControlCharacters) {
+    writeConfiguration("eth0", "CONFIG_NAME=home\n");
+    const Ended ended = run({"modify", setting, "ConfigurationName=a\nDEVICE=b"});
+    EXPECT_EQ(ended.status, 1);
+    EXPECT_EQ(ended.err.substr(0, 35), "cimdhcp: CIM_ERR_INVALID_PARAMETER:");
+    EXPECT_EQ(readFile(configuration("eth0")), "CONFIG_NAME=home\n");
+}
+
+}  // namespace

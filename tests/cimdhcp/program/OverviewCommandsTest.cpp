@@ -1,0 +1,190 @@
+#include <gtest/gtest.h>
+
+#include <nlohmann/json.hpp>
+
+#include "ProgramRun.h"
+
+namespace {
+
+using test::Ended;
+
+class OverviewCommands : public test::ProgramTest {};
+
+TEST_F(OverviewCommands, ShowListsTheInterfaces) {
+    writeConfiguration("eth0", "CONFIG_NAME=office\n");
+    EXPECT_EQ(run({"show"}),
+              (Ended{0,
+                     "INTERFACE  DHCP  STATE   ADDRESS       SERVERS                 "
+                     "CONFIGURATION NAME\n"
+                     "eth0       on    bound   192.0.2.17    192.0.2.1, 2001:db8::1  office\n"
+                     "eth1       off   active  198.51.100.4  -                       -\n",
+                     ""}));
+}
+
+TEST_F(OverviewCommands, ShowCutsItsTableOnATerminalOnly) {
+    writeConfiguration("eth0", "CONFIG_NAME=office\n");
+    EXPECT_EQ(runOnTerminal(60, {"show"}),
+              (Ended{0,
+                     "INTERFACE  DHCP  STATE   ADDRESS     SERVERS     CONFIGURAT…\n"
+                     "eth0       on    bound   192.0.2.17  192.0.2.1…  office\n"
+                     "eth1       off   active  198.51.10…  -           -\n",
+                     ""}));
+    EXPECT_EQ(run({"show"}, {{"COLUMNS", "60"}}), run({"show"}));
+}
+
+TEST_F(OverviewCommands, ShowIsJsonWhenAsked) {
+    EXPECT_EQ(run({"--format", "json", "show"}), (Ended{0, R"({
+  "interfaces": [
+    {
+      "interface": "eth0",
+      "system": "Computer",
+      "dhcp": true,
+      "state": "bound",
+      "address": "192.0.2.17",
+      "servers": [
+        "192.0.2.1",
+        "2001:db8::1"
+      ],
+      "configurationName": null
+    },
+    {
+      "interface": "eth1",
+      "system": "Computer",
+      "dhcp": false,
+      "state": "active",
+      "address": "198.51.100.4",
+      "servers": [],
+      "configurationName": null
+    }
+  ]
+}
+)",
+                                                        ""}));
+}
+
+TEST_F(OverviewCommands, ShowKnowsTheServiceProcessor) {
+    setTree(test::computer("Computer", test::dhcpInterface("eth0", "192.0.2.1")) + "," +
+            test::computer("BMC", test::dhcpInterface("eth0", "192.0.2.9")));
+    EXPECT_EQ(run({"show"}),
+              (Ended{0,
+                     "SYSTEM    INTERFACE  DHCP  STATE  ADDRESS  SERVERS    CONFIGURATION NAME\n"
+                     "Computer  eth0       on    bound  -        192.0.2.1  -\n"
+                     "BMC       eth0       on    bound  -        192.0.2.9  -\n",
+                     ""}));
+}
+
+TEST_F(OverviewCommands, ShowSaysThatNothingUsesDhcp) {
+    setTree(test::computer("Computer", R"({"type": "NetworkInterface", "description": "",
+                                           "properties": {"Name": "eth1"}})"));
+    EXPECT_EQ(run({"show"}), (Ended{0,
+                                    "INTERFACE  DHCP  STATE  ADDRESS  SERVERS  CONFIGURATION NAME\n"
+                                    "eth1       off   -      -        -        -\n"
+                                    "No interface of this machine uses DHCP.\n",
+                                    ""}));
+}
+
+TEST_F(OverviewCommands, ShowSaysThatAMachineIsEmpty) {
+    setTree("");
+    EXPECT_EQ(run({"show"}), (Ended{0, "This machine has no network interfaces.\n", ""}));
+    EXPECT_EQ(run({"--format", "json", "show"}), (Ended{0, "{\n  \"interfaces\": []\n}\n", ""}));
+}
+
+TEST_F(OverviewCommands, ShowLeavesOutWhatIsNotServed) {
+    ZR::Testing::writeFile(directory() / "some.registration",
+                           "[QVXZR_DHCPCapabilities]\nprovider: DHCPClientProvider\n"
+                           "location: DHCPClientProvider\ntype: instance\nnamespace: root/cimv2\n");
+    EXPECT_EQ(run({"--registration-dir", directory().path(), "show"}),
+              (Ended{0,
+                     "INTERFACE  DHCP  STATE   ADDRESS       SERVERS  CONFIGURATION NAME\n"
+                     "eth0       -     active  192.0.2.17    -        -\n"
+                     "eth1       -     active  198.51.100.4  -        -\n",
+                     ""}));
+}
+
+TEST_F(OverviewCommands, ShowFailsInANamespaceThatIsNotServed) {
+    const Ended ended = run({"--namespace", "root/other", "show"});
+    EXPECT_EQ(ended.status, 1);
+    EXPECT_EQ(ended.out, "");
+    EXPECT_EQ(ended.err, "cimdhcp: CIM_ERR_INVALID_NAMESPACE: no namespace \"root/other\"\n");
+}
+
+TEST_F(OverviewCommands, TreePrintsAJsonTreeThatCanBeReadBack) {
+    const Ended first = run({"tree"});
+    EXPECT_EQ(first.status, 0);
+    EXPECT_EQ(first.err, "");
+    const auto json = nlohmann::json::parse(first.out);
+    EXPECT_EQ(json["nodes"][0]["properties"]["Name"], hostName());
+    EXPECT_EQ(json["nodes"][0]["children"][0]["children"][0]["properties"]["DHCPServerAddresses"],
+              nlohmann::json({"192.0.2.1", "2001:db8::1"}));
+    ZR::Testing::writeFile(tree(), first.out);
+    EXPECT_EQ(run({"tree"}), first);
+}
+
+TEST_F(OverviewCommands, ClassesListsWhatIsServed) {
+    const Ended ended = run({"classes"});
+    EXPECT_EQ(ended.status, 0);
+    EXPECT_EQ(ended.err, "");
+    EXPECT_EQ(ended.out.substr(0, ended.out.find(' ')), "CLASS");
+    const auto json = nlohmann::json::parse(run({"--format", "json", "classes"}).out)["classes"];
+    const auto has = [&json](const nlohmann::json& entry) {
+        return std::find(json.begin(), json.end(), entry) != json.end();
+    };
+    EXPECT_TRUE(has({{"class", "QVXZR_DHCPSettingData"},
+                     {"superclass", "CIM_DHCPSettingData"},
+                     {"kind", "element"},
+                     {"provider", "DHCPClientProvider"},
+                     {"namespaces", {"root/cimv2"}}}));
+    EXPECT_TRUE(has({{"class", "QVXZR_DHCPOrderedComponent"},
+                     {"superclass", "CIM_OrderedComponent"},
+                     {"kind", "association"},
+                     {"provider", "DHCPClientProvider"},
+                     {"namespaces", {"root/cimv2"}}}));
+    for (const auto& entry : json) {
+        EXPECT_NE(ended.out.find('\n' + entry["class"].get<std::string>() + ' '),
+                  std::string::npos);
+    }
+}
+
+TEST_F(OverviewCommands, ClassesAsATable) {
+    ZR::Testing::writeFile(directory() / "some.registration",
+                           "[QVXZR_DHCPElementCapabilities]\nprovider: DHCPClientProvider\n"
+                           "location: DHCPClientProvider\ntype: instance association\n"
+                           "namespace: root/cimv2\n");
+    EXPECT_EQ(
+        run({"--registration-dir", directory().path(), "classes"}),
+        (Ended{0,
+               "CLASS                          SUPERCLASS               KIND         PROVIDER\n"
+               "QVXZR_DHCPElementCapabilities  CIM_ElementCapabilities  association  "
+               "DHCPClientProvider\n",
+               ""}));
+}
+
+TEST_F(OverviewCommands, LiveMachineShowsTheInterfacesOfItsTree) {
+    const Ended tree = runAs(program(), {"tree"});
+    EXPECT_EQ(tree.status, 0);
+    EXPECT_EQ(tree.err, "");
+    std::vector<std::string> expected;
+    const auto document = nlohmann::json::parse(tree.out);
+    for (const auto& system : document["nodes"]) {
+        for (const auto& network : system.value("children", nlohmann::json::array())) {
+            for (const auto& node : network.value("children", nlohmann::json::array())) {
+                if (node["type"] == "NetworkInterface") {
+                    expected.push_back(node["properties"]["Name"]);
+                }
+            }
+        }
+    }
+    const Ended show = runAs(program(), {"--format", "json", "show"});
+    EXPECT_EQ(show.status, 0);
+    EXPECT_EQ(show.err, "");
+    std::vector<std::string> shown;
+    const auto overview = nlohmann::json::parse(show.out);
+    for (const auto& interface : overview["interfaces"]) {
+        shown.push_back(interface["interface"]);
+        EXPECT_TRUE(interface["dhcp"].is_boolean());
+    }
+    EXPECT_EQ(shown, expected);
+    EXPECT_EQ(runAs(program(), {"show"}).status, 0);
+}
+
+}  // namespace

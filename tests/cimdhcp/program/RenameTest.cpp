@@ -1,0 +1,150 @@
+#include <gtest/gtest.h>
+
+#include <filesystem>
+
+#include "ProgramRun.h"
+
+namespace {
+
+namespace fs = std::filesystem;
+using test::Ended;
+using ZR::Testing::readFile;
+
+class Rename : public test::ProgramTest {
+  protected:
+    [[nodiscard]] std::string nameOf(const std::string& interface) const {
+        return readFile(configuration(interface));
+    }
+};
+
+TEST_F(Rename, ChangesTheNameAndTellsTheOldOne) {
+    writeConfiguration("eth0", "# mine\nDEVICE=eth0\nCONFIG_NAME=home\n");
+    EXPECT_EQ(run({"rename", "eth0", "the office"}),
+              (Ended{0,
+                     "eth0: the configuration name is now \"the office\", was \"home\" (" +
+                         configuration("eth0") + ").\n",
+                     ""}));
+    EXPECT_EQ(nameOf("eth0"), "# mine\nDEVICE=eth0\nCONFIG_NAME=the office\n");
+}
+
+TEST_F(Rename, GivesANameToAnInterfaceThatHadNone) {
+    writeConfiguration("eth1", "DEVICE=eth1\n");
+    EXPECT_EQ(
+        run({"rename", "eth1", "lab"}),
+        (Ended{0, "eth1: the configuration name is now \"lab\" (" + configuration("eth1") + ").\n",
+               ""}));
+    EXPECT_EQ(nameOf("eth1"), "DEVICE=eth1\nCONFIG_NAME=lab\n");
+}
+
+TEST_F(Rename, TakesTheNameAway) {
+    writeConfiguration("eth0", "CONFIG_NAME=home\n");
+    EXPECT_EQ(run({"rename", "eth0", ""}).status, 0);
+    EXPECT_EQ(nameOf("eth0"), "CONFIG_NAME=\n");
+}
+
+TEST_F(Rename, ChangesNothingWithoutAFile) {
+    EXPECT_EQ(run({"rename", "eth0", "office"}),
+              (Ended{1, "",
+                     "cimdhcp: eth0 has no configuration file: there is no " +
+                         configuration("eth0") + "; --create makes it\n"}));
+    EXPECT_TRUE(fs::is_empty(dataDir()));
+}
+
+TEST_F(Rename, MakesTheFileWhenAsked) {
+    EXPECT_EQ(run({"rename", "eth0", "office", "--create"}),
+              (Ended{0,
+                     "Made the file " + configuration("eth0") +
+                         ".\n"
+                         "eth0: the configuration name is now \"office\" (" +
+                         configuration("eth0") + ").\n",
+                     ""}));
+    EXPECT_EQ(nameOf("eth0"), "DEVICE=eth0\nCONFIG_NAME=office\n");
+    EXPECT_EQ(fs::status(configuration("eth0")).permissions(), fs::perms(0644));
+}
+
+TEST_F(Rename, MakesTheDirectoryToo) {
+    fs::remove(dataDir());
+    EXPECT_EQ(run({"rename", "eth0", "office", "--create"}),
+              (Ended{0,
+                     "Made the directory " + dataDir() +
+                         "/.\n"
+                         "Made the file " +
+                         configuration("eth0") +
+                         ".\n"
+                         "eth0: the configuration name is now \"office\" (" +
+                         configuration("eth0") + ").\n",
+                     ""}));
+    EXPECT_EQ(nameOf("eth0"), "DEVICE=eth0\nCONFIG_NAME=office\n");
+}
+
+TEST_F(Rename, KeepsAFileThatIsThereWhenAskedToMakeOne) {
+    writeConfiguration("eth0", "KEEP=me\nCONFIG_NAME=home\n");
+    EXPECT_EQ(run({"rename", "eth0", "office", "--create"}).out,
+              "eth0: the configuration name is now \"office\", was \"home\" (" +
+                  configuration("eth0") + ").\n");
+    EXPECT_EQ(nameOf("eth0"), "KEEP=me\nCONFIG_NAME=office\n");
+}
+
+TEST_F(Rename, TellsInJsonWhatItDid) {
+    EXPECT_EQ(run({"--format", "json", "rename", "eth0", "office", "--create"}), (Ended{0, R"({
+  "operation": "rename",
+  "interface": "eth0",
+  "file": ")" + configuration("eth0") + R"(",
+  "fileCreated": true,
+  "directoryCreated": false,
+  "oldName": null,
+  "newName": "office"
+}
+)",
+                                                                                        ""}));
+}
+
+TEST_F(Rename, NamesTheInterfacesThatThereAre) {
+    EXPECT_EQ(
+        run({"rename", "eth7", "office"}),
+        (Ended{1, "", "cimdhcp: there is no interface \"eth7\"; this machine has: eth0, eth1\n"}));
+    setTree("");
+    EXPECT_EQ(run({"rename", "eth7", "office"}),
+              (Ended{1, "", "cimdhcp: there is no interface \"eth7\"; this machine has none\n"}));
+}
+
+TEST_F(Rename, AsksWhichOfTwoInterfacesOfOneName) {
+    setTree(test::computer("Computer", test::dhcpInterface("eth0", "192.0.2.1")) + "," +
+            test::computer("BMC", test::dhcpInterface("eth0", "192.0.2.9")));
+    writeConfiguration("eth0", "CONFIG_NAME=home\n");
+    EXPECT_EQ(run({"rename", "eth0", "office"}),
+              (Ended{1, "",
+                     "cimdhcp: there are several interfaces \"eth0\"; name one of: Computer%eth0, "
+                     "BMC%eth0\n"}));
+    EXPECT_EQ(run({"rename", "BMC%eth0", "office"}).status, 0);
+    EXPECT_EQ(nameOf("eth0"), "CONFIG_NAME=office\n");
+}
+
+TEST_F(Rename, RefusesNamesThatWouldNotComeBack) {
+    writeConfiguration("eth0", "CONFIG_NAME=home\n");
+    EXPECT_EQ(run({"rename", "eth0", "a\nb"}),
+              (Ended{2, "",
+                     "cimdhcp: \"a\\x0Ab\" cannot be a configuration name: it must be one line, "
+                     "without blanks at its ends or quotation marks around it\n"}));
+    EXPECT_EQ(run({"rename", "eth0", " x"}).status, 2);
+    EXPECT_EQ(nameOf("eth0"), "CONFIG_NAME=home\n");
+}
+
+TEST_F(Rename, FindsOutThatItDidNotTakeEffect) {
+    // The provider answers OK all the same.
+    fs::create_directory(configuration("eth0"));
+    EXPECT_EQ(run({"rename", "eth0", "office"}),
+              (Ended{1, "",
+                     "cimdhcp: the configuration name of eth0 is still \"\": " +
+                         configuration("eth0") + " is no regular file\n"}));
+}
+
+TEST_F(Rename, RefusesInterfacesThatCannotHaveAFile) {
+    setTree(test::computer("Computer", test::dhcpInterface("../eth0", "192.0.2.1")));
+    EXPECT_EQ(run({"rename", "../eth0", "office", "--create"}),
+              (Ended{1, "",
+                     "cimdhcp: the name \"../eth0\" cannot be part of a file's name: such an "
+                     "interface has no configuration file\n"}));
+}
+
+}  // namespace

@@ -1,0 +1,87 @@
+#include <gtest/gtest.h>
+
+#include "ProgramRun.h"
+
+namespace {
+
+using test::Ended;
+
+class Usage : public test::ProgramTest {
+  protected:
+    Ended plain(const std::vector<std::string>& arguments,
+                const test::Environment& extra = {}) const {
+        return runAs(program(), arguments, extra);
+    }
+};
+
+TEST_F(Usage, VersionIsPrinted) {
+    EXPECT_EQ(plain({"--version"}), (Ended{0, "cimdhcp " CIMDHCP_VERSION "\n", ""}));
+}
+
+TEST_F(Usage, HelpIsPrintedAndFitsATerminal) {
+    const Ended ended = plain({"--help"});
+    EXPECT_EQ(ended.status, 0);
+    EXPECT_EQ(ended.err, "");
+    EXPECT_EQ(ended.out.substr(0, 35), "Usage: cimdhcp [OPTIONS] COMMAND\n\nS");
+    std::size_t start = 0;
+    for (std::size_t end = ended.out.find('\n'); end != std::string::npos;
+         start = end + 1, end = ended.out.find('\n', start)) {
+        EXPECT_LE(end - start, 86U) << ended.out.substr(start, end - start);
+    }
+}
+
+TEST_F(Usage, MistakesAreStatusTwo) {
+    const std::string hint = " (\"cimdhcp --help\" tells more)\n";
+    EXPECT_EQ(plain({}), (Ended{2, "", "cimdhcp: a command is missing" + hint}));
+    EXPECT_EQ(plain({"serve"}), (Ended{2, "", "cimdhcp: there is no command \"serve\"" + hint}));
+    EXPECT_EQ(plain({"get"}), (Ended{2, "", "cimdhcp: PATH is required" + hint}));
+    EXPECT_EQ(
+        plain({"--format", "mof", "show"}),
+        (Ended{2, "", "cimdhcp: this command has no MOF output; use --format table or json\n"}));
+    EXPECT_EQ(plain({"names", "QVXZR_DHCPCapabilities.InstanceID=\"eth0\""}),
+              (Ended{2, "",
+                     "cimdhcp: \"QVXZR_DHCPCapabilities.InstanceID=\"eth0\"\" is the path of an "
+                     "instance; give its class alone: QVXZR_DHCPCapabilities\n"}));
+    EXPECT_EQ(plain({"get", "QVXZR_DHCPCapabilities.InstanceID=eth0"}).status, 2);
+    EXPECT_EQ(plain({"references", "QVXZR_DHCPCapabilities"}).status, 2);
+}
+
+TEST_F(Usage, ATreeThatCannotBeReadIsStatusThree) {
+    const std::string missing = directory() / "missing.json";
+    EXPECT_EQ(plain({"--tree", missing, "show"}),
+              (Ended{3, "", "cimdhcp: " + missing + ": No such file or directory\n"}));
+    ZR::Testing::writeFile(tree(), "{\n  \"nodes\": [x]\n}");
+    EXPECT_EQ(
+        run({"tree"}),
+        (Ended{3, "",
+               "cimdhcp: " + tree() +
+                   ": line 2, column 13: syntax error while parsing value - invalid literal\n"}));
+    ZR::Testing::writeFile(tree(), R"({"nodes": [{"type": 7}]})");
+    const Ended notATree = run({"show"});
+    EXPECT_EQ(notATree.status, 3);
+    EXPECT_EQ(notATree.out, "");
+    EXPECT_EQ(notATree.err.substr(0, 62 + tree().size()),
+              "cimdhcp: " + tree() + ": this JSON is no instrumentation tree (the system lo");
+    // It does not matter how the tree was named.
+    EXPECT_EQ(plain({"show"}, {{"ZR_INSTRUMENTATION_TREE", missing}}).status, 3);
+}
+
+TEST_F(Usage, ADataDirectoryThatIsNoneIsStatusThree) {
+    EXPECT_EQ(plain({"--data-dir", tree(), "show"}),
+              (Ended{3, "", "cimdhcp: " + tree() + ": is no directory\n"}));
+}
+
+TEST_F(Usage, UnusableSettingsAreTold) {
+    const Ended ended = run({"names", "QVXZR_DHCPCapabilities"}, {{"ZR_TRACE_LEVEL", "high"}});
+    EXPECT_EQ(ended.status, 0);
+    EXPECT_EQ(ended.err,
+              "cimdhcp: warning: ZR_TRACE_LEVEL=\"high\": not a level (a number from 0)\n");
+}
+
+TEST_F(Usage, OutputThatCannotBeWrittenIsStatusThree) {
+    // A shell does the redirection; /dev/full is a disk without room.
+    EXPECT_EQ(runAs("/bin/sh", {"-c", "exec \"$0\" --version >/dev/full", program()}),
+              (Ended{3, "", "cimdhcp: the output cannot be written\n"}));
+}
+
+}  // namespace
