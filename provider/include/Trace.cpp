@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <array>
 #include <charconv>
+#include <cstdint>
 #include <cstring>
 #include <string_view>
 
@@ -12,22 +13,37 @@ namespace ZR {
 
 namespace {
 
+/// A line format, taken apart at its conversions when the program is compiled: a
+/// literal stands before each argument, and the last one behind them all.
+struct Format {
+    std::array<std::string_view, 5> literals;
+    std::size_t arguments = 0;
+
+    consteval explicit Format(std::string_view text) {
+        for (std::size_t at = text.find('%'); at != std::string_view::npos; at = text.find('%')) {
+            literals[arguments++] = text.substr(0, at);
+            text.remove_prefix(at + 2);
+        }
+        literals[arguments] = text;
+    }
+};
+
 constexpr std::array plainFormats{
-    "ENTERING: %s() in %s [Line: %d]",
-    "EXITING: %s() in %s [Line: %d]",
-    "METHOD: %s() was invoked in %s [Line: %d]",
-    "MESSAGE [File: %s, Line: %d]: %s",
+    Format("ENTERING: %s() in %s [Line: %d]"),
+    Format("EXITING: %s() in %s [Line: %d]"),
+    Format("METHOD: %s() was invoked in %s [Line: %d]"),
+    Format("MESSAGE [File: %s, Line: %d]: %s"),
 };
 
 constexpr std::array parameterFormats{
-    "ENTERING: %s() in %s [Line: %d],Parameters List: %s",
-    "EXITING: %s() in %s [Line: %d],Parameters List: %s",
-    "METHOD: %s() was invoked in %s [Line: %d],Parameters List: %s",
-    "MESSAGE [File: %s, Line: %d]: %s,Parameters List: %s",
+    Format("ENTERING: %s() in %s [Line: %d],Parameters List: %s"),
+    Format("EXITING: %s() in %s [Line: %d],Parameters List: %s"),
+    Format("METHOD: %s() was invoked in %s [Line: %d],Parameters List: %s"),
+    Format("MESSAGE [File: %s, Line: %d]: %s,Parameters List: %s"),
 };
 
-constexpr const char* textVariable = "VARIABLE: '%s' has Value '%s' at line %d in %s";
-constexpr const char* numberVariable = "VARIABLE: '%s' has Value '%d' at line %d in %s";
+constexpr Format textVariable("VARIABLE: '%s' has Value '%s' at line %d in %s");
+constexpr Format numberVariable("VARIABLE: '%s' has Value '%d' at line %d in %s");
 
 /// The argument of one conversion: %s takes a text, %d a number.
 struct Argument {
@@ -48,34 +64,59 @@ struct Argument {
     std::string_view text;
 };
 
-using Buffer = std::array<char, traceBufferSize>;
-
-/// Formats into the zeroed buffer, up to its last byte, which stays zero. Knows
-/// just the conversions that the formats above have.
-template <std::size_t count>
-const char* format(Buffer& buffer, std::string_view text, const Argument (&arguments)[count]) {
-    buffer.fill('\0');
-    char* out = buffer.data();
-    const char* const last = buffer.data() + buffer.size() - 1;
-    const auto put = [&out, last](std::string_view piece) {
-        const auto room = static_cast<std::size_t>(last - out);
-        const std::size_t size = std::min(piece.size(), room);
-        std::memcpy(out, piece.data(), size);
-        out += size;
-    };
-    for (const Argument& argument : arguments) {
-        const std::size_t conversion = text.find('%');
-        put(text.substr(0, conversion));
-        put(argument.text);
-        text.remove_prefix(conversion + 2);
+/// Copies a few bytes without a call: pieces of trace lines are short, and calling
+/// memcpy for each costs more than the copying.
+inline void copyShort(char* out, const char* in, std::size_t size) {
+    constexpr std::size_t word = sizeof(std::uint64_t);
+    constexpr std::size_t half = sizeof(std::uint32_t);
+    if (size >= word) {
+        for (std::size_t done = 0; done + word < size; done += word) {
+            std::memcpy(out + done, in + done, word);
+        }
+        std::memcpy(out + size - word, in + size - word, word);
+    } else if (size >= half) {
+        std::memcpy(out, in, half);
+        std::memcpy(out + size - half, in + size - half, half);
+    } else {
+        for (std::size_t done = 0; done < size; ++done) {
+            out[done] = in[done];
+        }
     }
-    put(text);
-    return buffer.data();
+}
+
+/// A buffer of one helper. Behind the text that was formatted last it is all zero,
+/// so that zeroing it whole means zeroing that text.
+struct Buffer {
+    std::array<char, traceBufferSize> text;
+    std::size_t used;
+
+    void zero() {
+        std::memset(text.data(), 0, used);
+        used = 0;
+    }
+
+    void put(std::string_view piece) {
+        const std::size_t size = std::min(piece.size(), text.size() - 1 - used);
+        copyShort(text.data() + used, piece.data(), size);
+        used += size;
+    }
+};
+
+/// Formats into the zeroed buffer, up to its last byte, which stays zero.
+template <std::size_t count>
+const char* format(Buffer& buffer, const Format& format, const Argument (&arguments)[count]) {
+    buffer.zero();
+    for (std::size_t i = 0; i < count; ++i) {
+        buffer.put(format.literals[i]);
+        buffer.put(arguments[i].text);
+    }
+    buffer.put(format.literals[count]);
+    return buffer.text.data();
 }
 
 const char* formatNothing(Buffer& buffer) {
-    buffer.fill('\0');
-    return buffer.data();
+    buffer.zero();
+    return buffer.text.data();
 }
 
 constexpr const char* separator =
@@ -87,17 +128,17 @@ constexpr const char* markFile = "include/Trace";
 }  // namespace
 
 const char* trace(const char* variable, const char* file, unsigned line, const char* value) {
-    static thread_local Buffer buffer;
+    static thread_local Buffer buffer{};
     return format(buffer, textVariable, {variable, value, line, file});
 }
 
 const char* trace(const char* variable, const char* file, unsigned line, unsigned value) {
-    static thread_local Buffer buffer;
+    static thread_local Buffer buffer{};
     return format(buffer, numberVariable, {variable, value, line, file});
 }
 
 const char* trace(const char* file, const char* function, unsigned line, MessageType type) {
-    static thread_local Buffer buffer;
+    static thread_local Buffer buffer{};
     if (type > message) {
         return formatNothing(buffer);
     }
@@ -109,7 +150,7 @@ const char* trace(const char* file, const char* function, unsigned line, Message
 
 const char* tracepara(const char* file, const char* function, unsigned line, const char* parameters,
                       MessageType type) {
-    static thread_local Buffer buffer;
+    static thread_local Buffer buffer{};
     if (type > message) {
         return formatNothing(buffer);
     }

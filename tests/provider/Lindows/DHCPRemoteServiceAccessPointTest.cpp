@@ -246,23 +246,26 @@ TEST_F(DHCPRemoteServiceAccessPointTest, NameFilterAloneComparesWithAnEmptyText)
 
 TEST_F(DHCPRemoteServiceAccessPointTest, NameFilterBehindASystemNameFilterComparesWithItsStart) {
     const AccessPoint::Filter system{AccessPoint::FilterBySystemName, hostName()};
+    // As many characters as stand before the interface name's last "_", here one.
     ASSERT_GE(hostName().size(), 2U);
-    const std::string start = hostName().substr(0, 2);
+    const std::string start = hostName().substr(0, 1);
     const auto name = [](const std::string& reference) {
         return AccessPoint::Filter{AccessPoint::FilterByName, reference};
     };
-    EXPECT_TRUE(accepts("br_lan", {system, name(start + "_IPv4")}));
-    EXPECT_FALSE(accepts("br_lan", {system, name(start.substr(0, 1) + "_IPv4")}));
-    EXPECT_FALSE(accepts("br_lan", {system, name("_IPv4")}));
+    EXPECT_TRUE(accepts("b_lan", {system, name(start + "_IPv4")}));
+    EXPECT_FALSE(accepts("b_lan", {system, name(hostName() + "_IPv4")}));
+    EXPECT_FALSE(accepts("b_lan", {system, name(hostName().substr(0, 2) + "_IPv4")}));
+    EXPECT_FALSE(accepts("b_lan", {system, name("_IPv4")}));
+    EXPECT_TRUE(accepts("b_", {system, name(start + "_")}));
     // The last "_" of either counts.
-    EXPECT_TRUE(accepts("b__lan", {system, name(start + "_IPv4")}));
-    EXPECT_FALSE(accepts("br_lan", {system, name(start + "__IPv4")}));
+    EXPECT_TRUE(accepts("b__lan", {system, name(hostName().substr(0, 2) + "_IPv4")}));
+    EXPECT_FALSE(accepts("b_lan", {system, name(start + "__IPv4")}));
     // An interface name longer than the system's takes all of it.
     const std::string longName = std::string(hostName().size() + 1, 'x') + "_lan";
     EXPECT_TRUE(accepts(longName, {system, name(hostName() + "_IPv4")}));
     // In the other order the text is still empty when the name is compared, every time.
-    EXPECT_FALSE(accepts("br_lan", {name(start + "_IPv4"), system}));
-    EXPECT_TRUE(accepts("br_lan", {name("_IPv4"), system}));
+    EXPECT_FALSE(accepts("b_lan", {name(start + "_IPv4"), system}));
+    EXPECT_TRUE(accepts("b_lan", {name("_IPv4"), system}));
 }
 
 TEST_F(DHCPRemoteServiceAccessPointTest, OtherFilterTypesNeverReject) {

@@ -1,0 +1,33 @@
+#!/usr/bin/env bash
+# The road of one EnumerateInstances request through the provider, as its log tells
+# it, line for line. Times, line numbers, addresses and the host's name are what
+# differs from run to run; they are replaced by T, N, ADDRESS and HOST.
+#
+# Usage: road-of-one-request.sh PATH-OF-cimdhcp EXPECTED
+set -euo pipefail
+
+program=$1
+expected=$2
+work=$(mktemp -d)
+trap 'rm -rf "$work"' EXIT
+
+cat >"$work/tree.json" <<'TREE'
+{ "nodes": [ { "type": "ComputerSystem", "description": "Computer",
+  "properties": { "Name": "${HOSTNAME}" }, "children": [
+    { "type": "Network", "description": "Network", "children": [
+      { "type": "NetworkInterface", "description": "Ethernet interface",
+        "properties": { "Name": "eth0", "NameMaxLength": 15, "DHCPEnabled": true,
+                        "AddressSource": 1, "InterfaceState": 1 } } ] } ] } ] }
+TREE
+ZR_LOG_SINK=file:$work/log ZR_LOG_LEVEL=3000 \
+    "$program" --tree "$work/tree.json" instances QVXZR_DHCPProtocolEndpoint >/dev/null
+
+sed -E -e 's/^[0-9-]+T[0-9:.]+Z /T /' \
+    -e 's/^(T [0-9]+ [^ ]+ [^ ]+):[0-9]+ /\1:N /' \
+    -e 's/\[Line: [0-9]+\]/[Line: N]/; s/at line [0-9]+ in/at line N in/' \
+    -e 's/=0x[0-9a-f]+/=ADDRESS/g; s/=0( |$)/=ADDRESS\1/g' \
+    -e "s/'$(uname -n)'/'HOST'/" "$work/log" >"$work/actual"
+if [[ ${UPDATE_EXPECTED:-} == yes ]]; then
+    cp "$work/actual" "$expected"
+fi
+diff -u "$expected" "$work/actual"
