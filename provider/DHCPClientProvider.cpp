@@ -124,7 +124,7 @@ constexpr std::array servedClasses{
 /// the status stays as it was: the failure shows in the log alone.
 template <typename Operation>
 CMPIStatus serve(const TracePoint& at, const CMPIObjectPath* path, Operation operation) {
-    markProviderEntry(loggerDHCPClientProvider, at.source.file, at.function, at.line);
+    markProviderEntry(loggerDHCPClientProvider, at.source.file.data(), at.function.data(), at.line);
     const unsigned short classId = ProviderUtilities::getClassId(path);
     traceVariable(at, "classId", classId);
     CMPIStatus status{CMPI_RC_OK, nullptr};
@@ -133,7 +133,7 @@ CMPIStatus serve(const TracePoint& at, const CMPIObjectPath* path, Operation ope
     } catch (const std::exception& exception) {
         traceMessage(at, exception.what());
     }
-    markProviderExit(loggerDHCPClientProvider, at.source.file, at.function, at.line);
+    markProviderExit(loggerDHCPClientProvider, at.source.file.data(), at.function.data(), at.line);
     return status;
 }
 
@@ -192,7 +192,8 @@ CMPIStatus DHCPClient_ModifyInstance(CMPIInstanceMI* /*mi*/, const CMPIContext* 
             return;
         }
         const CMPIString* text = path->ft->toString(path, nullptr);
-        const char* l_strObjectPath = text == nullptr ? "" : text->ft->getCharPtr(text, nullptr);
+        const char* characters = text == nullptr ? nullptr : text->ft->getCharPtr(text, nullptr);
+        const std::string l_strObjectPath = characters == nullptr ? "" : characters;
         traceVariable(at, "l_strObjectPath", l_strObjectPath);
         CMPIDHCPSettingData adapter(broker, ctx, path);
         if (adapter) {
@@ -286,7 +287,7 @@ const AssociationClass* findAssociation(unsigned short classId) {
 CMPIStatus serveAssociators(const Request& request, const char* assocClass, const char* resultClass,
                             AssociatorColumn column, bool names) {
     const TracePoint& at = request.at;
-    markProviderEntry(loggerDHCPClientProvider, at.source.file, at.function, at.line);
+    markProviderEntry(loggerDHCPClientProvider, at.source.file.data(), at.function.data(), at.line);
     CMPIStatus status{CMPI_RC_OK, nullptr};
     bool served = true;
     const auto guarded = [&](const auto& step) {
@@ -326,7 +327,7 @@ CMPIStatus serveAssociators(const Request& request, const char* assocClass, cons
     if (served) {
         request.result->ft->returnDone(request.result);
     }
-    markProviderExit(loggerDHCPClientProvider, at.source.file, at.function, at.line);
+    markProviderExit(loggerDHCPClientProvider, at.source.file.data(), at.function.data(), at.line);
     return status;
 }
 
@@ -334,7 +335,7 @@ CMPIStatus serveAssociators(const Request& request, const char* assocClass, cons
 CMPIStatus serveReferences(const Request& request, const char* resultClass, ReferenceColumn column,
                            bool names) {
     const TracePoint& at = request.at;
-    markProviderEntry(loggerDHCPClientProvider, at.source.file, at.function, at.line);
+    markProviderEntry(loggerDHCPClientProvider, at.source.file.data(), at.function.data(), at.line);
     const unsigned short classId = ProviderUtilities::getClassId(resultClass);
     traceVariable(at, "classId", classId);
     CMPIStatus status{CMPI_RC_OK, nullptr};
@@ -351,7 +352,7 @@ CMPIStatus serveReferences(const Request& request, const char* resultClass, Refe
     } else {
         status.rc = CMPI_RC_ERR_INVALID_CLASS;
     }
-    markProviderExit(loggerDHCPClientProvider, at.source.file, at.function, at.line);
+    markProviderExit(loggerDHCPClientProvider, at.source.file.data(), at.function.data(), at.line);
     return status;
 }
 

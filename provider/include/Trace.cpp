@@ -49,7 +49,7 @@ constexpr Format numberVariable("VARIABLE: '%s' has Value '%d' at line %d in %s"
 struct Argument {
     // Implicit, so that a line reads like its format; the digits are written as needed.
     // NOLINTBEGIN(cppcoreguidelines-pro-type-member-init)
-    Argument(const char* argument) : text(argument == nullptr ? "(null)" : argument) {}
+    Argument(std::string_view argument) : text(argument) {}
     Argument(unsigned argument) {
         const auto* end =
             std::to_chars(digits.data(), digits.data() + digits.size(), static_cast<int>(argument))
@@ -95,6 +95,8 @@ struct Buffer {
         used = 0;
     }
 
+    [[nodiscard]] std::string_view view() const { return {text.data(), used}; }
+
     void put(std::string_view piece) {
         const std::size_t size = std::min(piece.size(), text.size() - 1 - used);
         copyShort(text.data() + used, piece.data(), size);
@@ -104,40 +106,45 @@ struct Buffer {
 
 /// Formats into the zeroed buffer, up to its last byte, which stays zero.
 template <std::size_t count>
-const char* format(Buffer& buffer, const Format& format, const Argument (&arguments)[count]) {
+std::string_view format(Buffer& buffer, const Format& format, const Argument (&arguments)[count]) {
     buffer.zero();
     for (std::size_t i = 0; i < count; ++i) {
         buffer.put(format.literals[i]);
         buffer.put(arguments[i].text);
     }
     buffer.put(format.literals[count]);
-    return buffer.text.data();
+    return buffer.view();
 }
 
-const char* formatNothing(Buffer& buffer) {
+std::string_view formatNothing(Buffer& buffer) {
     buffer.zero();
-    return buffer.text.data();
+    return buffer.view();
 }
 
-constexpr const char* separator =
+constexpr std::string_view separator =
     "==============================================================================";
-static_assert(std::string_view(separator).size() == 78);
+static_assert(separator.size() == 78);
 
 constexpr const char* markFile = "include/Trace";
 
 }  // namespace
 
-const char* trace(const char* variable, const char* file, unsigned line, const char* value) {
+namespace TraceText {
+
+std::string_view variable(std::string_view name, std::string_view file, unsigned line,
+                          std::string_view value) {
     static thread_local Buffer buffer{};
-    return format(buffer, textVariable, {variable, value, line, file});
+    return format(buffer, textVariable, {name, value, line, file});
 }
 
-const char* trace(const char* variable, const char* file, unsigned line, unsigned value) {
+std::string_view variable(std::string_view name, std::string_view file, unsigned line,
+                          unsigned value) {
     static thread_local Buffer buffer{};
-    return format(buffer, numberVariable, {variable, value, line, file});
+    return format(buffer, numberVariable, {name, value, line, file});
 }
 
-const char* trace(const char* file, const char* function, unsigned line, MessageType type) {
+std::string_view plain(std::string_view file, std::string_view function, unsigned line,
+                       MessageType type) {
     static thread_local Buffer buffer{};
     if (type > message) {
         return formatNothing(buffer);
@@ -148,8 +155,8 @@ const char* trace(const char* file, const char* function, unsigned line, Message
     return format(buffer, plainFormats[type], {function, file, line});
 }
 
-const char* tracepara(const char* file, const char* function, unsigned line, const char* parameters,
-                      MessageType type) {
+std::string_view withParameters(std::string_view file, std::string_view function, unsigned line,
+                                std::string_view parameters, MessageType type) {
     static thread_local Buffer buffer{};
     if (type > message) {
         return formatNothing(buffer);
@@ -160,17 +167,41 @@ const char* tracepara(const char* file, const char* function, unsigned line, con
     return format(buffer, parameterFormats[type], {function, file, line, parameters});
 }
 
+}  // namespace TraceText
+
+// A formatted text ends with the zero that its buffer keeps behind it.
+const char* trace(const char* variable, const char* file, unsigned line, const char* value) {
+    return TraceText::variable(TraceText::of(variable), TraceText::of(file), line,
+                               TraceText::of(value))
+        .data();
+}
+
+const char* trace(const char* variable, const char* file, unsigned line, unsigned value) {
+    return TraceText::variable(TraceText::of(variable), TraceText::of(file), line, value).data();
+}
+
+const char* trace(const char* file, const char* function, unsigned line, MessageType type) {
+    return TraceText::plain(TraceText::of(file), TraceText::of(function), line, type).data();
+}
+
+const char* tracepara(const char* file, const char* function, unsigned line, const char* parameters,
+                      MessageType type) {
+    return TraceText::withParameters(TraceText::of(file), TraceText::of(function), line,
+                                     TraceText::of(parameters), type)
+        .data();
+}
+
 void markProviderEntry(const std::string& logger, const char* file, const char* function,
                        unsigned line) {
     const TraceSource source{markFile, logger};
     writeLine(ZR_HERE, flowLevel, [] { return separator; });
-    writeLine(ZR_HERE, flowLevel, [&] { return trace(file, function, line, entering); });
+    writeLine(ZR_HERE, flowLevel, [&] { return TraceText::plain(file, function, line, entering); });
 }
 
 void markProviderExit(const std::string& logger, const char* file, const char* function,
                       unsigned line) {
     const TraceSource source{markFile, logger};
-    writeLine(ZR_HERE, flowLevel, [&] { return trace(file, function, line, exiting); });
+    writeLine(ZR_HERE, flowLevel, [&] { return TraceText::plain(file, function, line, exiting); });
     writeLine(ZR_HERE, flowLevel, [] { return separator; });
 }
 

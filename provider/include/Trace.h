@@ -2,6 +2,7 @@
 
 #include <cstddef>
 #include <string>
+#include <string_view>
 
 #include "tklogger/TKMessageBuffer.h"
 
@@ -40,6 +41,25 @@ const char* trace(const char* file, const char* function, unsigned line, Message
 /// The same with a list of parameters behind it.
 const char* tracepara(const char* file, const char* function, unsigned line, const char* parameters,
                       MessageType type);
+
+/// The same texts for callers that know their lengths; they share the helpers' buffers.
+namespace TraceText {
+
+/// A text that may be null, which is written as formatted printing writes it.
+inline std::string_view of(const char* text) {
+    return text == nullptr ? "(null)" : text;
+}
+
+std::string_view variable(std::string_view name, std::string_view file, unsigned line,
+                          std::string_view value);
+std::string_view variable(std::string_view name, std::string_view file, unsigned line,
+                          unsigned value);
+std::string_view plain(std::string_view file, std::string_view function, unsigned line,
+                       MessageType type);
+std::string_view withParameters(std::string_view file, std::string_view function, unsigned line,
+                                std::string_view parameters, MessageType type);
+
+}  // namespace TraceText
 
 /// Frame a request: a separator and the entering line; the exiting line and a
 /// separator. Their source location is that of the mark itself.

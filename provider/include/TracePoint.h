@@ -2,6 +2,7 @@
 
 #include <exception>
 #include <string>
+#include <string_view>
 
 #include "include/Trace.h"
 #include "tklogger/TKLogger.h"
@@ -20,18 +21,18 @@ inline constexpr const char* loggerCategory = "Merrow.DHCPClientProvider";
 
 /// A source file: its path below the provider's folder, without extension, and its logger.
 struct TraceSource {
-    const char* file;
+    std::string_view file;  ///< a literal
     const std::string& logger;
 };
 
 struct TracePoint {
     const TraceSource& source;
-    const char* function;
+    std::string_view function;  ///< a literal
     unsigned line;
 };
 
 /// This function and line of the file whose TraceSource is called `source`.
-#define ZR_HERE (::ZR::TracePoint{source, __func__, __LINE__})
+#define ZR_HERE (::ZR::TracePoint{source, {__func__, sizeof(__func__) - 1}, __LINE__})
 
 /// Hands a line to both roads of the logging service. The text is formatted anew
 /// for the second, since the first may have traced on its own.
@@ -40,19 +41,21 @@ void writeLine(const TracePoint& at, int level, const Text& text) {
     {
         TKLog::TKMessageBuffer line;
         line << text();
-        TKLog::TKLogger::logLevelMessage(at.source.file, at.function, at.line, at.source.logger,
-                                         level, nullptr, 0, 0, line.str());
+        TKLog::TKLogger::logLevelMessage(at.source.file.data(), at.function.data(), at.line,
+                                         at.source.logger, level, nullptr, 0, 0, line.str());
     }
     TKLog::TKMessageBuffer line;
     line << text();
-    TKLog::TKLogger::traceLevelMessage(at.source.file, at.function, at.line, at.source.logger,
-                                       level, nullptr, 0, 0, line.str());
+    TKLog::TKLogger::traceLevelMessage(at.source.file.data(), at.function.data(), at.line,
+                                       at.source.logger, level, nullptr, 0, 0, line.str());
 }
 
 /// VARIABLE lines.
-void traceVariable(const TracePoint& at, const char* name, const char* value);
-void traceVariable(const TracePoint& at, const char* name, const std::string& value);
-void traceVariable(const TracePoint& at, const char* name, unsigned value);
+void traceVariable(const TracePoint& at, std::string_view name, std::string_view value);
+void traceVariable(const TracePoint& at, std::string_view name, unsigned value);
+inline void traceVariable(const TracePoint& at, std::string_view name, const char* value) {
+    traceVariable(at, name, TraceText::of(value));
+}
 
 /// A METHOD line.
 void traceMethod(const TracePoint& at);
@@ -80,8 +83,6 @@ class ParameterScope {
     template <typename... Pieces>
     explicit ParameterScope(const TracePoint& at, const Pieces&... pieces) : at_(at) {
         (parameters_ << ... << pieces);
-        constexpr char terminator = '\0';  // formatting needs one
-        parameters_ << std::string_view(&terminator, 1);
         trace(entering);
     }
     ParameterScope(const ParameterScope&) = delete;

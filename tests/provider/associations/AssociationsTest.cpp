@@ -324,7 +324,7 @@ TEST_F(AssociationsTest, OrderOfAccessOfAReferenceDependsOnWhereTheWalkStarted) 
         }
         return values;
     };
-    const auto accessPoint = [this](const char* key) {
+    const auto accessPoint = [](const char* key) {
         return pathOf("QVXZR_DHCPRemoteServiceAccessPoint",
                       {{"SystemName", hostName()}, {"Name", key}});
     };
