@@ -26,7 +26,9 @@ if(ZR_SANITIZERS)
     add_link_options(-fsanitize=${ZR_SANITIZERS})
     # The check of virtual tables looks at memory through a pipe, and reports a fault
     # when a test has taken all descriptors away.
-    add_compile_options(-fno-sanitize=vptr)
+    if(ZR_SANITIZERS MATCHES undefined)
+        add_compile_options(-fno-sanitize=vptr)
+    endif()
     add_compile_definitions(ZR_SANITIZERS="${ZR_SANITIZERS}")
 endif()
 if(ZR_COVERAGE)

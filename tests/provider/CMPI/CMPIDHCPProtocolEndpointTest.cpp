@@ -165,7 +165,7 @@ TEST_F(CMPIDHCPProtocolEndpointTest, AnAdapterPastItsEndHasNoPath) {
     const cimom::broker::RequestScope scope;
     ZR::DHCPClientProvider::CMPIDHCPProtocolEndpoint adapter(host_.broker(), nullptr, "root/cimv2");
     EXPECT_NE(adapter.getObjectPath(), nullptr);  // on the interface without DHCP
-    EXPECT_FALSE(adapter);
+    EXPECT_FALSE(static_cast<bool>(adapter));
     EXPECT_EQ(adapter.getObjectPath(), nullptr);
     EXPECT_EQ(adapter.getCMPIInstance(nullptr), nullptr);
 }
@@ -175,7 +175,7 @@ TEST_F(CMPIDHCPProtocolEndpointTest, NullPathLeavesTheAdapterUnfiltered) {
     const cimom::broker::RequestScope scope;
     ZR::DHCPClientProvider::CMPIDHCPProtocolEndpoint adapter(
         host_.broker(), nullptr, static_cast<const CMPIObjectPath*>(nullptr));
-    EXPECT_TRUE(adapter);
+    EXPECT_TRUE(static_cast<bool>(adapter));
 }
 
 TEST_F(CMPIDHCPProtocolEndpointTest, NullFromTheBrokerGivesNull) {

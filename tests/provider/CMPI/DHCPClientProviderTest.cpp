@@ -30,7 +30,8 @@ class DHCPClientProviderTest : public test::TreeTest {
   protected:
     static std::vector<unsigned short> identifiers(const char* className) {
         std::vector<unsigned short> ids;
-        EXPECT_EQ(ZR::DHCPClientProvider::getClassId(className, "root/cimv2", ids), !ids.empty());
+        const bool found = ZR::DHCPClientProvider::getClassId(className, "root/cimv2", ids);
+        EXPECT_EQ(found, !ids.empty());
         return ids;
     }
 
@@ -177,7 +178,7 @@ INSTANTIATE_TEST_SUITE_P(Elements, ResultEndings,
                                            EndingCase{"QVXZR_DHCPRemoteServiceAccessPoint", 0, 0,
                                                       0},
                                            EndingCase{settingClass, 0, 0, 0}),
-                         [](const auto& info) { return std::string(info.param.className); });
+                         [](const auto& each) { return std::string(each.param.className); });
 
 TEST_F(DHCPClientProviderTest, UnknownClassIsInvalidWithoutResultsOrAnEnd) {
     for (const char* name : {"CIM_DHCPProtocolEndpoint", "QVXZR_ComputerSystem",

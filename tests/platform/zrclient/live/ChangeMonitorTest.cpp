@@ -247,6 +247,7 @@ TEST_F(ChangeMonitorTest, TheEndOfAProcessIsNoticed) {
             ::pause();
         }
     }
+    ASSERT_GT(process, 0);
     const std::array<std::int32_t, 1> pids{process};
     begin();
     monitor_.watchProcesses(pids);
@@ -277,6 +278,9 @@ int countSystemCalls(std::uint64_t number, const std::function<void()>& action, 
         ::raise(SIGSTOP);
         action();
         ::syscall(SYS_exit_group, 0);  // _exit() does more where a sanitizer watches
+    }
+    if (child < 0) {
+        return -1;
     }
     int status = 0;
     ::waitpid(child, &status, 0);

@@ -79,6 +79,13 @@ class Watched {
     std::shared_ptr<const Snapshot> tree_;
 };
 
+/// Starts the client, which goes to the background with its lease. It writes its
+/// process number only then, and nobody can end it properly before.
+void start(const std::string& options) {
+    run(client + std::string{" -1 -pf /run/client.pid "} + options + " eth1 < /dev/null");
+    EXPECT_TRUE(eventually([] { return !File::read("/run/client.pid").value_or("").empty(); }));
+}
+
 void expectLeased(Watched& eth1) {
     EXPECT_TRUE(eventually([&] {
         return eth1[Properties::DHCPServerAddresses] == PropertyValue{Servers{"198.51.100.1"}};
@@ -98,7 +105,7 @@ void liveThrough(const std::string& options, const char* leaseTime) {
     EXPECT_EQ(eth1[Properties::DHCPServerAddresses], PropertyValue{Servers{}});
     EXPECT_EQ(eth1[Properties::DHCPEnabled], PropertyValue{false});
 
-    run(client + std::string{" -1 -pf /run/client.pid "} + options + " eth1 < /dev/null");
+    start(options);
     expectLeased(eth1);
 
     run(client + std::string{" -r -pf /run/client.pid "} + options + " eth1 < /dev/null");
@@ -135,7 +142,7 @@ TEST(DhcpLife, AClientThatIsKilledLeavesItsLeaseAlive) {
     ZR_NEEDS_DHCP();
     EXPECT_TRUE(passesInNamespaces(30, [] {
         const Laboratory laboratory{"600s"};
-        run(client + std::string{" -1 -pf /run/client.pid eth1 < /dev/null"});
+        start("");
         Watched eth1;
         expectLeased(eth1);
         run("kill -9 $(cat /run/client.pid)");

@@ -66,11 +66,14 @@ bool passesInNamespaces(unsigned seconds, const std::function<void()>& body) {
         }
         // The first process of a process namespace ignores signals of its own kind, so
         // that an alarm in it would not end it; from outside SIGKILL does.
+        if (inner < 0) {
+            ::_exit(2);
+        }
         static pid_t watched;
         watched = inner;
         std::signal(SIGALRM, [](int) { ::kill(watched, SIGKILL); });
         ::alarm(seconds);
-        const int status = inner < 0 ? 1 : awaitEnd(inner);
+        const int status = awaitEnd(inner);
         ::_exit(WIFEXITED(status) ? WEXITSTATUS(status) : 3);
     }
     const int status = outer < 0 ? 1 : awaitEnd(outer);

@@ -1,0 +1,90 @@
+#include "CMPI/CMPIDHCPRemoteServiceAccessPoint.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include "CMPI/Host.h"
+#include "Tree.h"
+
+namespace {
+
+using test::dhcpInterface;
+using test::host;
+using test::Host;
+using test::keysOf;
+using test::pathOf;
+using test::serviceProcessor;
+using ::testing::ElementsAre;
+using ::testing::IsEmpty;
+using ::testing::SizeIs;
+
+constexpr const char* className = "QVXZR_DHCPRemoteServiceAccessPoint";
+
+class CMPIDHCPRemoteServiceAccessPointTest : public test::TreeTest {
+  protected:
+    Host host_;
+};
+
+TEST_F(CMPIDHCPRemoteServiceAccessPointTest, OneInstancePerServerAddress) {
+    setTree({host({dhcpInterface("eth0", {"192.0.2.1", "2001:db8::1"}), dhcpInterface("eth1")})});
+    const Host::Answer answer = host_.enumerate(pathOf(className));
+    ASSERT_THAT(answer.instances, SizeIs(2));
+    const cimom::Instance& first = *answer.instances[0];
+    EXPECT_EQ(test::textOf(first, "ElementName"), "DHCP Server");
+    EXPECT_EQ(test::textOf(first, "AccessInfo"), "192.0.2.1");
+    EXPECT_EQ(test::numberOf(first, "InfoFormat"), 3U);
+    EXPECT_EQ(test::numberOf(first, "AccessContext"), 7U);
+    EXPECT_EQ(test::textOf(first, "SystemCreationClassName"), "QVXZR_ComputerSystem");
+    EXPECT_EQ(test::textOf(first, "SystemName"), hostName());
+    EXPECT_EQ(test::textOf(first, "CreationClassName"), className);
+    EXPECT_EQ(test::textOf(first, "Name"), "eth0_IPv4");
+    EXPECT_THAT(first.properties, SizeIs(8));
+    const cimom::Instance& second = *answer.instances[1];
+    EXPECT_EQ(test::textOf(second, "AccessInfo"), "2001:db8::1");
+    EXPECT_EQ(test::numberOf(second, "InfoFormat"), 4U);
+    EXPECT_EQ(test::textOf(second, "Name"), "eth0_IPv6");
+}
+
+TEST_F(CMPIDHCPRemoteServiceAccessPointTest, ServerOfTheServiceProcessorHasTheHostsName) {
+    setTree({serviceProcessor({dhcpInterface("bmc0", {"192.0.2.1"})})});
+    const Host::Answer answer = host_.enumerateNames(pathOf(className));
+    EXPECT_THAT(keysOf(answer, "SystemName"), ElementsAre(hostName()));
+    EXPECT_THAT(keysOf(answer, "SystemCreationClassName"), ElementsAre("QVXZR_SPComputerSystem"));
+}
+
+TEST_F(CMPIDHCPRemoteServiceAccessPointTest, NameAloneSelectsAcrossAllSystems) {
+    // A name without a "_" of its own is never rejected.
+    setTree({host({dhcpInterface("eth0", {"192.0.2.1"})}),
+             serviceProcessor({dhcpInterface("bmc0", {"192.0.2.2"})})});
+    EXPECT_THAT(keysOf(host_.enumerateNames(pathOf(className, {{"Name", "eth0_IPv4"}})), "Name"),
+                ElementsAre("eth0_IPv4", "bmc0_IPv4"));
+}
+
+TEST_F(CMPIDHCPRemoteServiceAccessPointTest, SystemNameOfAnotherComputerSelectsNothingFurther) {
+    setTree({host({dhcpInterface("eth0", {"192.0.2.1"}), dhcpInterface("eth1", {"192.0.2.2"})})});
+    // The filter moves the cursor past the end, but the addresses that were loaded
+    // before stay: their one record is still there, without a path to tell.
+    const Host::Answer answer =
+        host_.enumerateNames(pathOf(className, {{"SystemName", "elsewhere"}}));
+    ASSERT_THAT(answer.paths, SizeIs(1));
+    EXPECT_EQ(test::keyOf(*answer.paths[0], "Name"), "_IPv4");
+}
+
+TEST_F(CMPIDHCPRemoteServiceAccessPointTest, NoServersGiveNothing) {
+    setTree({host({dhcpInterface("eth0"), test::interface("eth1")})});
+    EXPECT_THAT(host_.enumerate(pathOf(className)).instances, IsEmpty());
+}
+
+TEST_F(CMPIDHCPRemoteServiceAccessPointTest, AnAdapterPastItsAddressesHasNoPathAndNoInstance) {
+    setTree({host({dhcpInterface("eth0", {"192.0.2.1"})})});
+    const cimom::broker::RequestScope scope;
+    ZR::DHCPClientProvider::CMPIDHCPRemoteServiceAccessPoint adapter(host_.broker(), nullptr,
+                                                                     "root/cimv2");
+    EXPECT_NE(adapter.getObjectPath(), nullptr);
+    ++adapter;
+    EXPECT_FALSE(static_cast<bool>(adapter));
+    EXPECT_EQ(adapter.getObjectPath(), nullptr);
+    EXPECT_EQ(adapter.getCMPIInstance(nullptr), nullptr);
+}
+
+}  // namespace
