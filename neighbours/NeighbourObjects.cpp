@@ -1,11 +1,10 @@
 #include "NeighbourObjects.h"
 
-#include <strings.h>
-
 #include <algorithm>
 #include <array>
 
 #include "zrclient/NodeLexicon.h"
+#include "zrcommon/Strings.h"
 
 namespace ZR::DHCPClientNeighbours {
 
@@ -112,10 +111,9 @@ constexpr std::array<NeighbourClass, 4> neighbourClasses{{
 }};
 
 const NeighbourClass* find(const std::string& className) {
-    const auto* found = std::find_if(neighbourClasses.begin(), neighbourClasses.end(),
-                                     [&className](const NeighbourClass& entry) {
-                                         return ::strcasecmp(entry.name, className.c_str()) == 0;
-                                     });
+    const auto* found = std::find_if(
+        neighbourClasses.begin(), neighbourClasses.end(),
+        [&className](const NeighbourClass& entry) { return equalNames(entry.name, className); });
     return found == neighbourClasses.end() ? nullptr : found;
 }
 
@@ -123,7 +121,7 @@ const NeighbourClass* find(const std::string& className) {
 
 const std::string* NeighbourObject::key(const std::string& name) const {
     const auto found = std::find_if(keys.begin(), keys.end(), [&name](const auto& entry) {
-        return ::strcasecmp(entry.first, name.c_str()) == 0;
+        return equalNames(entry.first, name);
     });
     return found == keys.end() ? nullptr : &found->second;
 }
