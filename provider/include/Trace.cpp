@@ -85,40 +85,40 @@ inline void copyShort(char* out, const char* in, std::size_t size) {
 }
 
 /// A buffer of one helper. Behind the text that was formatted last it is all zero,
-/// so that zeroing it whole means zeroing that text.
+/// so that zeroing it for a new text means zeroing what of the old one is longer.
 struct Buffer {
     std::array<char, traceBufferSize> text;
     std::size_t used;
 
-    void zero() {
-        std::memset(text.data(), 0, used);
-        used = 0;
-    }
-
-    [[nodiscard]] std::string_view view() const { return {text.data(), used}; }
-
-    void put(std::string_view piece) {
-        const std::size_t size = std::min(piece.size(), text.size() - 1 - used);
-        copyShort(text.data() + used, piece.data(), size);
-        used += size;
+    /// Makes the first `size` bytes the whole content.
+    std::string_view keep(std::size_t size) {
+        if (size < used) {
+            std::memset(text.data() + size, 0, used - size);
+        }
+        used = size;
+        return {text.data(), used};
     }
 };
 
-/// Formats into the zeroed buffer, up to its last byte, which stays zero.
+/// Formats into the buffer, up to its last byte, which stays zero.
 template <std::size_t count>
 std::string_view format(Buffer& buffer, const Format& format, const Argument (&arguments)[count]) {
-    buffer.zero();
+    std::size_t size = 0;
+    const auto put = [&size, &buffer](std::string_view piece) {
+        const std::size_t fits = std::min(piece.size(), buffer.text.size() - 1 - size);
+        copyShort(buffer.text.data() + size, piece.data(), fits);
+        size += fits;
+    };
     for (std::size_t i = 0; i < count; ++i) {
-        buffer.put(format.literals[i]);
-        buffer.put(arguments[i].text);
+        put(format.literals[i]);
+        put(arguments[i].text);
     }
-    buffer.put(format.literals[count]);
-    return buffer.view();
+    put(format.literals[count]);
+    return buffer.keep(size);
 }
 
 std::string_view formatNothing(Buffer& buffer) {
-    buffer.zero();
-    return buffer.view();
+    return buffer.keep(0);
 }
 
 constexpr std::string_view separator =
