@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <array>
 #include <charconv>
-#include <cstdint>
 #include <cstring>
 #include <string_view>
 
@@ -64,19 +63,22 @@ struct Argument {
     std::string_view text;
 };
 
+/// Copies `size` bytes as a run of blocks and a last block that overlaps the run.
+template <std::size_t block>
+inline void copyBlocks(char* out, const char* in, std::size_t size) {
+    for (std::size_t done = 0; done + block < size; done += block) {
+        std::memcpy(out + done, in + done, block);
+    }
+    std::memcpy(out + size - block, in + size - block, block);
+}
+
 /// Copies a few bytes without a call: pieces of trace lines are short, and calling
 /// memcpy for each costs more than the copying.
 inline void copyShort(char* out, const char* in, std::size_t size) {
-    constexpr std::size_t word = sizeof(std::uint64_t);
-    constexpr std::size_t half = sizeof(std::uint32_t);
-    if (size >= word) {
-        for (std::size_t done = 0; done + word < size; done += word) {
-            std::memcpy(out + done, in + done, word);
-        }
-        std::memcpy(out + size - word, in + size - word, word);
-    } else if (size >= half) {
-        std::memcpy(out, in, half);
-        std::memcpy(out + size - half, in + size - half, half);
+    if (size >= 16) {
+        copyBlocks<16>(out, in, size);
+    } else if (size >= 4) {
+        copyBlocks<4>(out, in, size);
     } else {
         for (std::size_t done = 0; done < size; ++done) {
             out[done] = in[done];
