@@ -46,6 +46,7 @@ TEST(Files, WhatMayNotBeReadIsAComplaint) {
     const auto content = readOptionalFile(root.path("/file"), complaints);
     const auto names = listOptionalDirectory(root.path("/directory"), complaints);
     ASSERT_EQ(::seteuid(user), 0);
+    ASSERT_EQ(::chmod(root.path("/directory").c_str(), 0700), 0);  // else it could not be removed
     EXPECT_EQ(content, std::nullopt);
     EXPECT_THAT(names, IsEmpty());
     EXPECT_THAT(complaints,
