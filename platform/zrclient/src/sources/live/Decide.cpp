@@ -385,6 +385,9 @@ std::shared_ptr<const Snapshot> decide(MachineFacts facts, std::int64_t now) {
             builder.property(decision.property, std::move(decision.value), readOnly);
         }
     }
+    if (machine.serviceProcessor()) {
+        addServiceProcessor(*machine.serviceProcessor(), builder);
+    }
     return builder.build();
 }
 

@@ -11,6 +11,7 @@
 #include "Address.h"
 #include "Lease.h"
 #include "Link.h"
+#include "ServiceProcessor.h"
 #include "zrclient/NodeLexicon.h"
 #include "zrclient/Snapshot.h"
 
@@ -24,6 +25,7 @@ struct MachineFacts {
     std::vector<Lease> leases;
     std::vector<Management> managements;
     std::vector<ClientProcess> processes;
+    std::optional<ServiceProcessor> serviceProcessor = std::nullopt;
 
     bool operator==(const MachineFacts&) const = default;
 };
@@ -79,6 +81,9 @@ class Machine {
 
     [[nodiscard]] std::span<const InterfaceView> interfaces() const { return views_; }
     [[nodiscard]] const std::string& hostName() const { return facts_.hostName; }
+    [[nodiscard]] const std::optional<ServiceProcessor>& serviceProcessor() const {
+        return facts_.serviceProcessor;
+    }
 
   private:
     void collectLeases(std::int64_t now);
@@ -91,7 +96,8 @@ class Machine {
     std::vector<std::size_t> byName_;   // positions in views_, by name
 };
 
-/// The tree of a machine: the computer, its network, and the interfaces in it.
+/// The tree of a machine: the computer, its network, and the interfaces in it; behind
+/// it the service processor, where there is one.
 /// Depends on nothing but the facts and the time.
 [[nodiscard]] std::shared_ptr<const Snapshot> decide(MachineFacts facts, std::int64_t now);
 

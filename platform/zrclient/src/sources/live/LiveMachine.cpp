@@ -9,6 +9,7 @@
 
 #include "Decide.h"
 #include "Dhclient.h"
+#include "IpmiDevice.h"
 #include "Networkd.h"
 #include "Processes.h"
 #include "tklogger/TKLogger.h"
@@ -68,6 +69,9 @@ void complainToLog(std::string_view message) {
 LiveMachine::LiveMachine(Surroundings surroundings)
     : surroundings_(std::move(surroundings)),
       reader_(std::move(surroundings_.transport)),
+      processor_(
+          surroundings_.ipmi ? std::move(surroundings_.ipmi) : ipmiDevice(surroundings_.roots),
+          surroundings_.uptime),
       places_(fixedPlaces(surroundings_.roots)) {
     if (!surroundings_.complain) {
         surroundings_.complain = complainToLog;
@@ -75,7 +79,8 @@ LiveMachine::LiveMachine(Surroundings surroundings)
 }
 
 bool LiveMachine::changed() {
-    return monitor_.changed();
+    // Being asked is what moves the talk with the service processor on.
+    return processor_.changed() || monitor_.changed();
 }
 
 std::shared_ptr<const Snapshot> LiveMachine::read() {
@@ -90,13 +95,15 @@ std::shared_ptr<const Snapshot> LiveMachine::read() {
         watchProcesses(clients.processes);
     }
     markWireless(surroundings_.roots, network.links);
+    std::optional<ServiceProcessor> processor = processor_.read(complaints);
     report(std::move(complaints));
     return decide({.hostName = getSystemName(),
                    .links = std::move(network.links),
                    .addresses = std::move(network.addresses),
                    .leases = std::move(clients.leases),
                    .managements = std::move(clients.managements),
-                   .processes = std::move(clients.processes)},
+                   .processes = std::move(clients.processes),
+                   .serviceProcessor = std::move(processor)},
                   surroundings_.now());
 }
 
