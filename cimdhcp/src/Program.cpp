@@ -11,6 +11,8 @@
 #include "cimdhcp/CommandLine.h"
 #include "cimdhcp/Directories.h"
 #include "cimdhcp/Failure.h"
+#include "cimdhcp/Graph.h"
+#include "cimdhcp/GraphDrawing.h"
 #include "cimdhcp/JsonFormat.h"
 #include "cimdhcp/MachineOverview.h"
 #include "cimdhcp/MofFormat.h"
@@ -46,6 +48,12 @@ class Execution {
         const RenameReport report =
             rename(command, ZR::PlatformUtilities::getKestraDataDir(), client);
         outputs_.out << (json() ? renameJson(report) : renameText(report));
+    }
+
+    void operator()(const GraphCommand& command) const {
+        Client client = openClient();
+        const std::string text = graphvizText(graphOfMachine(client));
+        outputs_.out << (command.svg ? drawSvg(text) : text);
     }
 
     void operator()(const TreeCommand& /*command*/) const {
