@@ -122,6 +122,7 @@ bool ProviderUtilities::areClassesRelated(const CMPIBroker* broker, const std::s
     if (broker == nullptr || parent == nullptr) {
         return false;
     }
+    // NOLINTNEXTLINE(readability-suspicious-call-argument): either may be the ancestor
     return classIsA(broker, nameSpace, className, parent) ||
            classIsA(broker, nameSpace, parent, className);
 }
