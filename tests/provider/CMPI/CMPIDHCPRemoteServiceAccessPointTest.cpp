@@ -5,7 +5,7 @@
 
 #include <array>
 
-#include "CMPI/ElementAdapter.h"
+#include "CMPI/ElementTables.h"
 #include "CMPI/Host.h"
 #include "Tree.h"
 
@@ -90,7 +90,7 @@ TEST_F(CMPIDHCPRemoteServiceAccessPointTest, ServerWhoseAddressCannotBeReadHasNo
     const CMPIObjectPath* path =
         host_.broker()->eft->newObjectPath(host_.broker(), "root/cimv2", className, &status);
     const CMPIInstance* instance =
-        ZR::DHCPClientProvider::makeInstance(host_.broker(), path, Element(), properties);
+        ZR::DHCPClientProvider::makeInstance<Element>(host_.broker(), path, Element(), properties);
     ASSERT_NE(instance, nullptr);
     EXPECT_EQ(instance->ft->getPropertyCount(instance, &status), 1U);
     instance->ft->getProperty(instance, "AccessInfo", &status);
