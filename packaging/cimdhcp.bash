@@ -32,7 +32,7 @@ _cimdhcp() {
             return
             ;;
         --tree)
-            mapfile -t COMPREPLY < <(compgen -d -- "$word"; compgen -f -X '!*.json' -- "$word")
+            mapfile -t COMPREPLY < <(compgen -o plusdirs -f -X '!*.json' -- "$word")
             return
             ;;
         --data-dir | --schema-dir | --registration-dir | --provider-dir)
