@@ -8,6 +8,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <ostream>
 #include <string>
 #include <vector>
 
@@ -34,6 +35,10 @@ struct Cell {
     unsigned steps = 0;             ///< of an associator walk that yields nothing
     const char* failure = nullptr;  ///< what ends the walk over the references
 };
+
+std::ostream& operator<<(std::ostream& out, const Cell& cell) {
+    return out << cell.association << ' ' << cell.name;
+}
 
 class AssociationCells : public test::MachineTest, public ::testing::WithParamInterface<Cell> {
   protected:

@@ -55,6 +55,24 @@ std::string Request::name() const {
     return text;
 }
 
+std::string Request::identifier() const {
+    constexpr std::string_view prefix = "QVXZR_";
+    const auto bare = [&](const std::string& text) {
+        const std::string className = text.substr(0, text.find('.'));
+        return className.starts_with(prefix) ? className.substr(prefix.size()) : className;
+    };
+    std::string text = nameOf(operation);
+    std::erase(text, ' ');
+    text += "Of" + bare(path);
+    if (path.find('.') == std::string::npos && !isOfInstances()) {
+        text += "WithoutKeys";
+    }
+    if (!isOfInstances()) {
+        text += "Through" + (association == nullptr ? std::string("Any") : bare(association));
+    }
+    return text;
+}
+
 Host::Answer run(Host& host, const Request& request) {
     const cimom::ObjectPath path = pathFrom(request.path);
     switch (request.operation) {
@@ -102,6 +120,28 @@ const std::vector<ElementSource>& elementSources() {
         {"QVXZR_DHCPRemoteServiceAccessPoint", serverPath},
     };
     return sources;
+}
+
+std::vector<Request> allRequests() {
+    std::vector<Request> requests;
+    for (const auto& [className, path] : elementSources()) {
+        requests.push_back({Operation::enumerateNames, className});
+        requests.push_back({Operation::enumerate, className});
+        requests.push_back({Operation::get, path});
+    }
+    requests.push_back({Operation::modify, settingPath});
+    for (const auto& [association, first, second] : associationSources()) {
+        requests.push_back({Operation::enumerateNames, association});
+        requests.push_back({Operation::enumerate, association});
+        requests.push_back({Operation::get, association});
+        for (const std::string& source : {first, second}) {
+            for (const Operation operation : {Operation::associatorNames, Operation::associators,
+                                              Operation::referenceNames, Operation::references}) {
+                requests.push_back({operation, source, association});
+            }
+        }
+    }
+    return requests;
 }
 
 }  // namespace test

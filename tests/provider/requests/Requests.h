@@ -1,5 +1,6 @@
 #pragma once
 
+#include <ostream>
 #include <string>
 #include <vector>
 
@@ -28,7 +29,13 @@ struct Request {
     [[nodiscard]] bool isOfInstances() const { return operation <= Operation::modify; }
     /// "associators of CLASS... through CLASS".
     [[nodiscard]] std::string name() const;
+    /// The same without keys, as an identifier: "associatorsOfComputerSystemThrough...".
+    [[nodiscard]] std::string identifier() const;
 };
+
+inline std::ostream& operator<<(std::ostream& out, const Request& request) {
+    return out << request.identifier();
+}
 
 /// Runs the request. A modify writes the configuration name "new".
 Host::Answer run(Host& host, const Request& request);
@@ -48,5 +55,10 @@ struct ElementSource {
     std::string path;
 };
 const std::vector<ElementSource>& elementSources();
+
+/// Every request that names a class or a path of the lists above: enumerations and
+/// gets of all classes, a modify, and the four association requests from both ends
+/// of each association.
+std::vector<Request> allRequests();
 
 }  // namespace test
