@@ -12,6 +12,7 @@
 #include "NetlinkTransport.h"
 #include "Roots.h"
 #include "RtnetlinkReader.h"
+#include "zrclient/LiveSource.h"
 #include "zrclient/SnapshotSource.h"
 
 namespace ZR::Live {
@@ -28,6 +29,7 @@ struct Surroundings {
     /// False when the process file system is one that was laid out: its numbers
     /// then are those of other processes.
     bool realProcesses = true;
+    Explain explain = Explain::No;
     /// Takes what could not be read, or not for certain.
     std::function<void(std::string_view)> complain;
 };
@@ -41,9 +43,9 @@ class LiveMachine final : public SnapshotSource {
     [[nodiscard]] std::shared_ptr<const Snapshot> read() override;
 
   private:
-    [[nodiscard]] ClientFacts readClients(std::vector<std::string>& complaints);
-    void watchProcesses(const std::vector<ClientProcess>& processes);
-    void report(std::vector<std::string> complaints);
+    [[nodiscard]] ClientFacts readClients();
+    void watchProcesses(const ClientFacts& clients);
+    void report(const std::vector<std::string>& complaints);
 
     Surroundings surroundings_;
     RtnetlinkReader reader_;
