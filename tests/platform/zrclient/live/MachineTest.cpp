@@ -87,6 +87,19 @@ TEST_F(MachineTest, ARenamedLinkIsKnownByItsAddressAndTheAddressesEnd) {
     EXPECT_EQ(machine().interfaces()[1].leases.size(), 0U);
 }
 
+TEST_F(MachineTest, ARenamedLinkOfUdhcpcHasAnAddressWithoutAnEnd) {
+    facts_.clients.leases = {lease("before", "192.0.2.3")};
+    facts_.clients.leases[0].client = Client::Udhcpc;
+    facts_.clients.leases[0].clientAlive = true;
+    facts_.addresses[1].validLifetime = Address::infinite;
+    EXPECT_EQ(machine().interfaces()[1].leases.size(), 1U);
+    facts_.clients.leases[0].clientAlive = false;
+    EXPECT_EQ(machine().interfaces()[1].leases.size(), 0U);
+    facts_.clients.leases[0].clientAlive = true;
+    facts_.clients.leases[0].client = Client::Dhclient;
+    EXPECT_EQ(machine().interfaces()[1].leases.size(), 0U);
+}
+
 TEST_F(MachineTest, AClientThatNamesLinksByIndexIsTakenAtItsWord) {
     facts_.clients.leases = {lease("", "192.0.2.3")};
     facts_.clients.leases[0].ifindex = 9;

@@ -41,13 +41,19 @@ bool concerns(const ClientProcess& process, const Link& link) {
            process.interfaces.end();
 }
 
+/// Whether an address is what a client made of a lease, as far as their ends tell.
 bool endsWith(const Address& address, const Lease& lease, std::int64_t now) {
     if (!lease.expires) {
         return false;
     }
-    if (*lease.expires == Lease::never || address.validLifetime == Address::infinite) {
-        return *lease.expires == Lease::never && address.validLifetime == Address::infinite &&
-               lease.clientAlive;
+    if (address.validLifetime == Address::infinite) {
+        // udhcpc sets no other addresses. That they have no end tells little, so that
+        // the client must run.
+        return lease.clientAlive &&
+               (*lease.expires == Lease::never || lease.client == Client::Udhcpc);
+    }
+    if (*lease.expires == Lease::never) {
+        return false;
     }
     const std::int64_t difference = *lease.expires - now - address.validLifetime;
     return difference >= -renamedTolerance && difference <= renamedTolerance;
