@@ -7,55 +7,11 @@
 set -euo pipefail
 
 program=$1
-for tool in ip dnsmasq dhclient; do
-    command -v "$tool" >/dev/null || PATH=$PATH:/usr/sbin:/sbin
-    command -v "$tool" >/dev/null || { echo "needs $tool"; exit 1; }
-done
-[[ $EUID == 0 ]] || { echo "needs root: makes network namespaces"; exit 1; }
+source "$(dirname "$0")/dhcp-laboratory.sh"
+command -v dhclient >/dev/null || { echo "needs dhclient"; exit 1; }
+start_server
 
-server=zr-server-$$
-client=zr-client-$$
-work=$(mktemp -d)
-dnsmasq_pid=
-
-cleanup() {
-    [[ -f $work/dhclient.pid ]] && kill "$(<"$work/dhclient.pid")" 2>/dev/null || true
-    [[ -n $dnsmasq_pid ]] && kill "$dnsmasq_pid" 2>/dev/null || true
-    ip netns delete "$client" 2>/dev/null || true
-    ip netns delete "$server" 2>/dev/null || true
-    rm -rf "$work"
-}
-trap cleanup EXIT
-
-fail() {
-    echo "FAILED: $*"
-    exit 1
-}
-
-# expect TEXT COMMAND...: the command's output has the text.
-expect() {
-    local text=$1 output
-    shift
-    output=$("$@" 2>&1) || fail "$* answers status $?: $output"
-    [[ $output == *"$text"* ]] || fail "$* lacks \"$text\": $output"
-}
-
-ip netns add "$server"
-ip netns add "$client"
-ip link add zrs$$ netns "$server" type veth peer name eth1 netns "$client"
-ip -n "$server" address add 198.51.100.1/24 dev zrs$$
-ip -n "$server" link set zrs$$ up
-ip -n "$client" link set lo up
-ip -n "$client" link set eth1 up
-
-ip netns exec "$server" dnsmasq --keep-in-foreground --conf-file=/dev/null --port=0 \
-    --interface=zrs$$ --bind-interfaces --dhcp-authoritative --no-ping --user=root \
-    --dhcp-range=198.51.100.100,198.51.100.150,255.255.255.0,10m \
-    --dhcp-leasefile="$work/server.leases" --pid-file="$work/dnsmasq.pid" >"$work/dnsmasq.log" 2>&1 &
-dnsmasq_pid=$!
-
-# The client sees a host of its own: its leases, resolver and configuration files
-# are in the test's folder. The client's hook sets the address and nothing else.
+# The client's hook sets the address and nothing else.
 cat >"$work/hook" <<'HOOK'
 #!/bin/sh
 case $reason in
@@ -67,16 +23,6 @@ case $reason in
 esac
 HOOK
 chmod 755 "$work/hook"
-mkdir "$work/data" "$work/leases"
-in_client() {
-    ip netns exec "$client" unshare --mount sh -c '
-        mount --bind "$1" /var/lib/dhcp && shift && exec "$@"' sh "$work/leases" "$@"
-}
-cimdhcp() {
-    in_client env ZR_LOG_SINK=stderr ZR_DATA_DIR="$work/data" "$program" "$@"
-}
-
-[[ -d /var/lib/dhcp ]] || mkdir -p /var/lib/dhcp
 # Before there is a client, nothing uses DHCP (and a veth end without an address is no
 # interface of the computer).
 output=$(cimdhcp instances QVXZR_DHCPProtocolEndpoint)
@@ -89,10 +35,13 @@ address=$(ip -n "$client" -4 -o address show dev eth1 scope global | awk '{print
 [[ -n $address ]] || fail "the client has no address"
 
 endpoint=QVXZR_DHCPProtocolEndpoint
+compact_json() {
+    cimdhcp --format json "$@" | tr -d ' \n'
+}
 expect 'EnabledState            = 2 (Enabled)' cimdhcp instances $endpoint
 expect 'ClientState             = 8 (Bound)' cimdhcp instances $endpoint
 expect '"ClientState":{"type":"uint16","value":8}' \
-    sh -c "$(declare -f in_client cimdhcp); client=$client work=$work program=$program; cimdhcp --format json instances $endpoint | tr -d ' \n'"
+    compact_json instances $endpoint
 expect "$address" cimdhcp show
 expect 198.51.100.1 cimdhcp show
 

@@ -17,7 +17,7 @@ trap 'rm -rf "$directory"' EXIT
 packages=("$directory"/packages/*.deb)
 echo "== packages"
 for package in "${packages[@]}"; do
-    dpkg-deb --show --showformat='${Package}: ${Description}\n' "$package" | head -n 1
+    dpkg-deb --show --showformat='${Package}: ${Description}\n' "$package" | sed -n 1p
 done
 lintian --allow-root --fail-on error --suppress-tags initial-upload-closes-no-bugs "${packages[@]}"
 

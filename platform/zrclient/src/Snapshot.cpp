@@ -143,6 +143,15 @@ const SnapshotProperty* Snapshot::find(Index index, NodeLexicon::Properties id) 
     return found == all.end() ? nullptr : &*found;
 }
 
+std::string_view Snapshot::origin(Index index, NodeLexicon::Properties id) const {
+    const SnapshotProperty* const property = find(index, id);
+    if (property == nullptr) {
+        return {};
+    }
+    const auto position = static_cast<std::size_t>(property - properties_.data());
+    return position < origins_.size() ? std::string_view{origins_[position]} : std::string_view{};
+}
+
 Snapshot::Index Snapshot::first(NodeLexicon::NodeType type) const noexcept {
     switch (type) {
         case NodeLexicon::NodeType::NetworkInterface:
@@ -223,10 +232,19 @@ void SnapshotBuilder::property(NodeLexicon::Properties id, PropertyValue value, 
     ++node.propertyCount;
 }
 
+void SnapshotBuilder::origin(std::string text) {
+    if (!properties_.empty()) {
+        origins_.resize(properties_.size());
+        origins_.back() = std::move(text);
+    }
+}
+
 std::shared_ptr<const Snapshot> SnapshotBuilder::build() {
     Snapshot snapshot;
     snapshot.nodes_ = std::exchange(nodes_, {});
     snapshot.properties_ = std::exchange(properties_, {});
+    snapshot.origins_ = std::exchange(origins_, {});
+    snapshot.remarks_ = std::exchange(remarks_, {});
     // A snapshot is kept much longer than it takes to build it.
     snapshot.nodes_.shrink_to_fit();
     snapshot.properties_.shrink_to_fit();

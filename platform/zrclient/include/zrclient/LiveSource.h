@@ -6,10 +6,14 @@
 
 namespace ZR {
 
+/// Whether each property of a tree is to bear where it came from. It costs a text for
+/// each, so that only who prints it asks for it.
+enum class Explain : bool { No, Yes };
+
 /// The live Linux machine as a source: its computer, networks and interfaces
 /// with what the kernel and the DHCP clients tell of them. Never null, never
 /// throws apart from std::bad_alloc; what cannot be opened is logged and left
 /// out of the readings.
-[[nodiscard]] std::unique_ptr<SnapshotSource> openLiveSource();
+[[nodiscard]] std::unique_ptr<SnapshotSource> openLiveSource(Explain explain = Explain::No);
 
 }  // namespace ZR

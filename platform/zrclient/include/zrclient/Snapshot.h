@@ -5,6 +5,7 @@
 #include <span>
 #include <string>
 #include <string_view>
+#include <utility>
 #include <variant>
 #include <vector>
 
@@ -56,6 +57,13 @@ class Snapshot {
     /// The property of a node, or null. O(properties of the node).
     [[nodiscard]] const SnapshotProperty* find(Index index, NodeLexicon::Properties id) const;
 
+    /// Where a property of a node came from, for people; empty when nobody asked the
+    /// source to tell, or there is no such property.
+    [[nodiscard]] std::string_view origin(Index index, NodeLexicon::Properties id) const;
+
+    /// What could not be read, or not for certain, one sentence each.
+    [[nodiscard]] std::span<const std::string> remarks() const noexcept { return remarks_; }
+
     /// First node of a lexicon type in document order, or none. O(1).
     [[nodiscard]] Index first(NodeLexicon::NodeType type) const noexcept;
 
@@ -69,7 +77,7 @@ class Snapshot {
     /// the look-up of paths is measured.
     [[nodiscard]] static std::uint64_t keyComparisons() noexcept;
 
-    /// Equal nodes with equal properties in equal order.
+    /// Equal nodes with equal properties in equal order, and equal words about them.
     bool operator==(const Snapshot&) const = default;
 
   private:
@@ -80,6 +88,8 @@ class Snapshot {
 
     std::vector<Node> nodes_;
     std::vector<SnapshotProperty> properties_;
+    std::vector<std::string> origins_;  // of the properties in their order; may be fewer
+    std::vector<std::string> remarks_;
     std::vector<Index> pathIndex_;  // open addressing by the hash of the path
     Index firstNetworkInterface_ = none;
     Index firstComputerSystem_ = none;
@@ -98,12 +108,20 @@ class SnapshotBuilder {
     /// replaced in its place. Without a node there is nothing to add to.
     void property(NodeLexicon::Properties id, PropertyValue value, bool readOnly = false);
 
+    /// Says where the property added last came from.
+    void origin(std::string text);
+
+    /// Adds what could not be read, or not for certain.
+    void remark(std::string text) { remarks_.push_back(std::move(text)); }
+
     /// The finished snapshot; the builder is empty afterwards.
     [[nodiscard]] std::shared_ptr<const Snapshot> build();
 
   private:
     std::vector<Snapshot::Node> nodes_;
     std::vector<SnapshotProperty> properties_;
+    std::vector<std::string> origins_;
+    std::vector<std::string> remarks_;
 };
 
 }  // namespace ZR

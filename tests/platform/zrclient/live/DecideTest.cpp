@@ -57,26 +57,34 @@ class DecideTest : public testing::Test {
         return facts_.addresses.back();
     }
     Lease& lease(const std::string& text = leased, const std::string& from = server) {
-        facts_.leases.push_back({.client = Client::Dhclient,
-                                 .interfaceName = "eth0",
-                                 .family = AF_INET,
-                                 .address = text,
-                                 .server = from,
-                                 .expires = now + 600});
-        return facts_.leases.back();
+        facts_.clients.leases.push_back({.client = Client::Dhclient,
+                                         .interfaceName = "eth0",
+                                         .family = AF_INET,
+                                         .address = text,
+                                         .server = from,
+                                         .expires = now + 600});
+        return facts_.clients.leases.back();
     }
-    Management& management(std::optional<bool> dhcp4, std::optional<bool> dhcp6 = false) {
-        facts_.managements.push_back({.client = Client::Networkd,
-                                      .ifindex = index,
-                                      .dhcp4 = dhcp4,
-                                      .dhcp6 = dhcp6,
-                                      .staticAddresses = {}});
-        return facts_.managements.back();
+    LinkConfiguration& management(std::optional<bool> dhcp4, std::optional<bool> dhcp6 = false) {
+        facts_.clients.managements.push_back({.client = Client::Networkd,
+                                              .ifindex = index,
+                                              .dhcp4 = dhcp4,
+                                              .dhcp6 = dhcp6,
+                                              .staticAddresses = {}});
+        return facts_.clients.managements.back();
     }
     ClientProcess& process(bool ipv6 = false) {
-        facts_.processes.push_back(
+        facts_.clients.processes.push_back(
             {.client = Client::Dhclient, .interfaces = {"eth0"}, .leaseFile = "", .ipv6 = ipv6});
-        return facts_.processes.back();
+        return facts_.clients.processes.back();
+    }
+    LinkConfiguration& configuration(std::optional<bool> dhcp4) {
+        facts_.clients.configurations.push_back({.client = Client::Ifcfg,
+                                                 .interfaceName = "eth0",
+                                                 .dhcp4 = dhcp4,
+                                                 .dhcp6 = {},
+                                                 .staticAddresses = {}});
+        return facts_.clients.configurations.back();
     }
     Link& link() { return facts_.links.front(); }
     void enslave(const char* masterKind) {
@@ -214,7 +222,7 @@ TEST_F(DecideTest, AnExpiredLeaseIsNotLive) {
     address(leased);
     lease().expires = now;
     EXPECT_EQ(servers(), PropertyValue{Servers{}});
-    facts_.leases.back().expires = now + 1;
+    facts_.clients.leases.back().expires = now + 1;
     EXPECT_EQ(servers(), PropertyValue{Servers{server}});
 }
 
@@ -222,7 +230,7 @@ TEST_F(DecideTest, ALeaseWithoutAnEndIsLive) {
     address(leased);
     lease().expires = Lease::never;
     EXPECT_EQ(servers(), PropertyValue{Servers{server}});
-    facts_.leases.back().expires = std::nullopt;
+    facts_.clients.leases.back().expires = std::nullopt;
     EXPECT_EQ(servers(), PropertyValue{Servers{server}});
 }
 
@@ -233,16 +241,45 @@ TEST_F(DecideTest, AReleasedLeaseIsNotLive) {
 }
 
 TEST_F(DecideTest, ALeaseOfALinkThatIsGoneShowsNowhere) {
-    address(leased, 600, 0);
+    address(leased, 900, 0);  // leased anew, by another link
     lease().interfaceName = "eth9";
     EXPECT_EQ(servers(), PropertyValue{Servers{}});
+    facts_.clients.leases.back().expires = Lease::never;
+    EXPECT_EQ(servers(), PropertyValue{Servers{}});
+    facts_.addresses.back().validLifetime = Address::infinite;
+    EXPECT_EQ(servers(), PropertyValue{Servers{}});
+}
+
+TEST_F(DecideTest, ALeaseByNameFollowsARename) {
+    address(leased, 598, 0);
+    lease().interfaceName = "before";
+    EXPECT_EQ(servers(), PropertyValue{Servers{server}});
+    EXPECT_EQ(source(), number(1));
+    // Two links with the address: nobody can tell which of them was called so.
+    Link twin = link();
+    twin.ifindex = 5;
+    twin.name = "eth5";
+    facts_.links.push_back(twin);
+    address(leased, 598, 0).ifindex = 5;
+    EXPECT_EQ(servers(), PropertyValue{Servers{}});
+}
+
+TEST_F(DecideTest, ALeaseByNameWithoutAnEndFollowsARenameWhileItsClientRuns) {
+    address(leased);
+    lease().interfaceName = "before";
+    facts_.clients.leases.back().expires = Lease::never;
+    EXPECT_EQ(servers(), PropertyValue{Servers{}});
+    EXPECT_EQ(enabled(), PropertyValue{false});
+    facts_.clients.leases.back().clientAlive = true;
+    EXPECT_EQ(servers(), PropertyValue{Servers{server}});
+    EXPECT_EQ(enabled(), PropertyValue{true});
 }
 
 TEST_F(DecideTest, ALeaseThatNamesItsLinkTwiceMustNameOneLink) {
     address(leased, 600, 0);
     lease().ifindex = index;
     EXPECT_EQ(servers(), PropertyValue{Servers{server}});
-    facts_.leases.back().interfaceName = "renamed";
+    facts_.clients.leases.back().interfaceName = "renamed";
     EXPECT_EQ(servers(), PropertyValue{Servers{}});
 }
 
@@ -300,9 +337,9 @@ TEST_F(DecideTest, WithoutAnyHintDhcpIsOff) {
 TEST_F(DecideTest, TheManagersConfigurationDecides) {
     management(true);
     EXPECT_EQ(enabled(), PropertyValue{true});
-    facts_.managements.back().dhcp4 = false;
+    facts_.clients.managements.back().dhcp4 = false;
     EXPECT_EQ(enabled(), PropertyValue{false});
-    facts_.managements.back().dhcp6 = true;
+    facts_.clients.managements.back().dhcp6 = true;
     EXPECT_EQ(enabled(), PropertyValue{true});
 }
 
@@ -337,7 +374,7 @@ TEST_F(DecideTest, AManagerWhoseConfigurationIsUnknownSaysNothing) {
 TEST_F(DecideTest, AClientOfEitherProtocolOnTheLinkEnables) {
     process(true);
     EXPECT_EQ(enabled(), PropertyValue{true});
-    facts_.processes.back().interfaces = {"eth1"};
+    facts_.clients.processes.back().interfaces = {"eth1"};
     EXPECT_EQ(enabled(), PropertyValue{false});
 }
 
@@ -364,7 +401,7 @@ TEST_F(DecideTest, ALiveLeaseOfTheAddressIsDhcpOrBootp) {
     address(leased);
     lease();
     EXPECT_EQ(source(), number(1));
-    facts_.leases.back().bootp = true;
+    facts_.clients.leases.back().bootp = true;
     EXPECT_EQ(source(), number(2));
 }
 
@@ -406,7 +443,7 @@ TEST_F(DecideTest, PermanentDoesNotMeanStaticWhereTheManagerUsesDhcp) {
     address(leased);
     management(true);
     EXPECT_EQ(source(), number(0));
-    facts_.managements.back().dhcp4 = false;
+    facts_.clients.managements.back().dhcp4 = false;
     EXPECT_EQ(source(), number(3));
 }
 
@@ -414,11 +451,11 @@ TEST_F(DecideTest, WithoutAnAddressTheIntentCounts) {
     EXPECT_EQ(source(), number(0));
     management(false).linkLocal4 = true;
     EXPECT_EQ(source(), number(4));
-    facts_.managements.back().staticAddresses = {"192.0.2.1"};
+    facts_.clients.managements.back().staticAddresses = {"192.0.2.1"};
     EXPECT_EQ(source(), number(3));
-    facts_.managements.back().dhcp4 = true;
+    facts_.clients.managements.back().dhcp4 = true;
     EXPECT_EQ(source(), number(1));
-    facts_.managements.clear();
+    facts_.clients.managements.clear();
     process();
     EXPECT_EQ(source(), number(1));
 }
@@ -434,6 +471,130 @@ TEST_F(DecideTest, LeaseWithoutItsClientStaysDhcpUntilTheKernelEndsIt) {
     lease();
     EXPECT_EQ(source(), number(1));
     EXPECT_EQ(servers(), PropertyValue{Servers{server}});
+}
+
+// --- what clients leave besides leases
+
+TEST_F(DecideTest, AConfigurationSpeaksWhereNoManagerDoes) {
+    configuration(true);
+    EXPECT_EQ(enabled(), PropertyValue{true});
+    EXPECT_EQ(source(), number(1));
+    management(false);
+    EXPECT_EQ(enabled(), PropertyValue{false});
+    EXPECT_EQ(source(), number(0));
+    facts_.clients.managements.back().dhcp4 = std::nullopt;
+    EXPECT_EQ(enabled(), PropertyValue{true});
+    EXPECT_EQ(source(), number(1));
+}
+
+TEST_F(DecideTest, AConfigurationWithoutDhcpSpeaksLouderThanALifetime) {
+    address(leased, 600, 0);
+    configuration(false);
+    EXPECT_EQ(enabled(), PropertyValue{false});
+    facts_.clients.configurations.back().dhcp6 = true;
+    EXPECT_EQ(enabled(), PropertyValue{true});
+    facts_.clients.configurations.back() = {.client = Client::Ifcfg,
+                                            .interfaceName = "eth0",
+                                            .dhcp4 = {},
+                                            .dhcp6 = {},
+                                            .staticAddresses = {}};
+    EXPECT_EQ(enabled(), PropertyValue{true}) << "it does not tell, but the lifetime does";
+}
+
+TEST_F(DecideTest, AClientSpeaksLouderThanAConfiguration) {
+    configuration(false);
+    process();
+    EXPECT_EQ(enabled(), PropertyValue{true});
+}
+
+TEST_F(DecideTest, APermanentAddressIsWhatItsConfigurationSays) {
+    address(leased);
+    LinkConfiguration& told = configuration(true);
+    EXPECT_EQ(source(), number(1));
+    told.staticAddresses = {leased};
+    EXPECT_EQ(source(), number(3)) << "a further address that was told";
+    told.staticAddresses.clear();
+    told.dhcp4 = false;
+    EXPECT_EQ(source(), number(3));
+    told.bootp4 = true;
+    EXPECT_EQ(source(), number(2));
+    told.bootp4 = false;
+    told.other4 = true;
+    EXPECT_EQ(source(), number(5));
+}
+
+TEST_F(DecideTest, WithoutAnAddressTheConfigurationIsTheIntent) {
+    LinkConfiguration& told = configuration(false);
+    EXPECT_EQ(source(), number(0));
+    told.other4 = true;
+    EXPECT_EQ(source(), number(5));
+    told.linkLocal4 = true;
+    EXPECT_EQ(source(), number(4));
+    told.staticAddresses = {leased};
+    EXPECT_EQ(source(), number(3));
+    told.bootp4 = true;
+    EXPECT_EQ(source(), number(2));
+    told.dhcp4 = true;
+    EXPECT_EQ(source(), number(1));
+}
+
+TEST_F(DecideTest, AnAddressThatTheManagerSharesIsOfAnotherKind) {
+    address(leased);
+    management(false).other4 = true;
+    EXPECT_EQ(source(), number(5));
+}
+
+TEST_F(DecideTest, UdhcpcLeavesPermanentAddresses) {
+    address(leased);
+    process().client = Client::Udhcpc;
+    EXPECT_EQ(source(), number(1));
+    EXPECT_EQ(enabled(), PropertyValue{true});
+    EXPECT_EQ(servers(), PropertyValue{Servers{}});
+    facts_.clients.processes.back().ipv6 = true;
+    EXPECT_EQ(source(), number(3));
+}
+
+TEST_F(DecideTest, AnAddressOfTheSystemsStartStaysWhatItWas) {
+    address(leased);
+    Lease& former = lease();
+    former.client = Client::Ipconfig;
+    former.outlivesEnd = true;
+    former.expires = now - 1;
+    EXPECT_EQ(source(), number(1));
+    EXPECT_EQ(servers(), PropertyValue{Servers{}}) << "it may be another's by now";
+    EXPECT_EQ(enabled(), PropertyValue{false}) << "nobody renews it";
+    former.bootp = true;
+    EXPECT_EQ(source(), number(2));
+    address("192.0.2.1");
+    facts_.addresses.erase(facts_.addresses.begin());
+    EXPECT_EQ(source(), number(3));
+}
+
+TEST_F(DecideTest, ASocketAtTheAddressTellsOfAClientAndItsServer) {
+    address(leased);
+    facts_.clients.sockets = {{.address = leased, .peer = server}};
+    EXPECT_EQ(enabled(), PropertyValue{true});
+    EXPECT_EQ(source(), number(1));
+    EXPECT_EQ(servers(), PropertyValue{Servers{server}});
+    lease(leased, "192.0.2.66");
+    EXPECT_EQ(servers(), PropertyValue{Servers{"192.0.2.66"}}) << "a lease says it itself";
+}
+
+TEST_F(DecideTest, ASocketOfAllLinksTellsOfTheLinkThatIsHeard) {
+    facts_.clients.sockets = {{.address = "", .peer = ""}};
+    EXPECT_EQ(enabled(), PropertyValue{false});
+    facts_.clients.packetLinks = {index};
+    EXPECT_EQ(enabled(), PropertyValue{true});
+    EXPECT_EQ(source(), number(0));
+}
+
+TEST_F(DecideTest, ServersOfIPv6StandBehindThoseOfIPv4) {
+    address("2001:db8::7", 600, 0).family = AF_INET6;
+    address(leased, 600, 0);
+    lease("2001:db8::7", "fe80::1").family = AF_INET6;
+    EXPECT_EQ(servers(), PropertyValue{Servers{"fe80::1"}});
+    lease();
+    EXPECT_EQ(servers(), (PropertyValue{Servers{server, "fe80::1"}}));
 }
 
 // --- ports
@@ -491,17 +652,38 @@ TEST(Precedence, TheLastRowOfEachPropertyAnswersForAnyInterface) {
     }
 }
 
-TEST_F(DecideTest, ADecisionNamesItsReason) {
+TEST_F(DecideTest, ADecisionNamesItsReasonAndWhereItIsFrom) {
     address(leased, 600, 0);
-    facts_.processes.clear();
-    const Machine machine{facts_, now};
-    ASSERT_EQ(machine.interfaces().size(), 1U);
-    std::map<Properties, std::string_view> reasons;
-    for (const Decision& decision : Machine::decide(machine.interfaces()[0])) {
-        reasons[decision.property] = decision.reason;
-    }
-    EXPECT_EQ(reasons.at(Properties::DHCPEnabled),
-              "an IPv4 address with an end: somebody renews it, and only DHCP does");
+    lease().origin = "/var/lib/dhcp/dhclient.leases";
+    process().pid = 17;
+    configuration(true).origin = "/etc/sysconfig/network/ifcfg-eth0";
+    const auto origins = [&] {
+        const auto tree = decide(facts_, now, Explain::Yes);
+        std::map<Properties, std::string> found;
+        for (const auto& property : NodeLexicon::properties) {
+            found[property.number] = tree->origin(2, property.number);
+        }
+        return found;
+    };
+    EXPECT_EQ(origins(),
+              (std::map<Properties, std::string>{
+                  {Properties::Name, "kernel: the kernel's name of the link"},
+                  {Properties::NameMaxLength, "kernel: the kernel takes no longer names"},
+                  {Properties::InterfaceState,
+                   "kernel: administrative and operational state of the link"},
+                  {Properties::IPv4Address,
+                   "dhclient /var/lib/dhcp/dhclient.leases: the address that a DHCP server leased"},
+                  {Properties::DHCPEnabled, "dhclient, process 17: a client runs on the link"},
+                  {Properties::AddressSource,
+                   "dhclient /var/lib/dhcp/dhclient.leases: a live lease names this very address"},
+                  {Properties::DHCPServerAddresses,
+                   "dhclient /var/lib/dhcp/dhclient.leases: the servers of the live leases"}}));
+    facts_.clients.leases.clear();
+    facts_.clients.processes.clear();
+    EXPECT_EQ(origins().at(Properties::DHCPEnabled),
+              "ifcfg /etc/sysconfig/network/ifcfg-eth0: the configuration that is kept for the "
+              "link");
+    EXPECT_EQ(decide(facts_, now)->origin(2, Properties::Name), "") << "nobody asked";
 }
 
 TEST_F(DecideTest, TenThousandInterfacesTakeNoQuadraticTime) {

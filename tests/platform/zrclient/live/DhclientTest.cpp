@@ -88,11 +88,6 @@ class DhclientTest : public testing::Test {
         }
         return servers;
     }
-    void age(std::string_view below, std::int64_t seconds) const {
-        const timespec time{.tv_sec = seconds, .tv_nsec = 0};
-        const std::array<timespec, 2> times{time, time};
-        ASSERT_EQ(::utimensat(AT_FDCWD, root_.path(below).c_str(), times.data(), 0), 0);
-    }
 
     TemporaryDirectory root_;
 };
@@ -109,7 +104,7 @@ TEST_F(DhclientTest, FilesOfAllItsStartersAreRead) {
           "/var/lib/NetworkManager/dhclient-11111111-2222-4333-8444-555555555555-eth1.lease"}) {
         ++number;
         root_.write(file, lease("eth1", "192.0.2.7", "192.0.2." + std::to_string(number)));
-        age(file, number);
+        root_.age(file, number);
     }
     EXPECT_THAT(servers(read()),
                 ElementsAre("192.0.2.5", "192.0.2.4", "192.0.2.3", "192.0.2.2", "192.0.2.1"));
@@ -125,24 +120,68 @@ TEST_F(DhclientTest, OtherFilesBesideThemAreNotRead) {
 
 TEST_F(DhclientTest, ALeaseBecomesAFullClaim) {
     root_.write("/var/lib/dhcp/dhclient.eth1.leases", sample("isc-dhclient/dhclient.eth1.leases"));
-    EXPECT_EQ(read().leases, (std::vector<Lease>{{.client = Client::Dhclient,
-                                                  .interfaceName = "eth1",
-                                                  .family = AF_INET,
-                                                  .address = "198.51.100.106",
-                                                  .server = "198.51.100.1",
-                                                  .expires = 1795216781}}));
+    EXPECT_EQ(read().leases,
+              (std::vector<Lease>{{.client = Client::Dhclient,
+                                   .interfaceName = "eth1",
+                                   .family = AF_INET,
+                                   .address = "198.51.100.106",
+                                   .server = "198.51.100.1",
+                                   .expires = 1795216781,
+                                   .origin = root_.path("/var/lib/dhcp/dhclient.eth1.leases")}}));
 }
 
 TEST_F(DhclientTest, ADhcpv6LeaseBecomesAClaimWithoutAServerAddress) {
     root_.write("/var/lib/dhcp/dhclient6.eth1.leases",
                 sample("isc-dhclient/dhclient6.eth1.leases.after-release"));
-    EXPECT_EQ(read().leases, (std::vector<Lease>{{.client = Client::Dhclient,
-                                                  .interfaceName = "eth1",
-                                                  .family = AF_INET6,
-                                                  .address = "2001:db8:99::16e",
-                                                  .server = "",
-                                                  .released = true,
-                                                  .expires = 1795217908}}));
+    EXPECT_EQ(read().leases,
+              (std::vector<Lease>{{.client = Client::Dhclient,
+                                   .interfaceName = "eth1",
+                                   .family = AF_INET6,
+                                   .address = "2001:db8:99::16e",
+                                   .server = "",
+                                   .released = true,
+                                   .expires = 1795217908,
+                                   .origin = root_.path("/var/lib/dhcp/dhclient6.eth1.leases")}}));
+}
+
+TEST_F(DhclientTest, CapturedUnderNetworkManager) {
+    const std::string profile = "11111111-2222-4333-8444-555555555555-eth1.lease";
+    for (const char* name : {"dhclient-", "dhclient6-"}) {
+        root_.write("/var/lib/NetworkManager/" + (name + profile),
+                    sample("networkmanager-dhclient/" + (name + profile)));
+        root_.age("/var/lib/NetworkManager/" + (name + profile), name[8] == '6' ? 1 : 2);
+    }
+    const ClientFacts facts =
+        read({process({"eth1"}, "/var/lib/NetworkManager/dhclient-" + profile)});
+    EXPECT_EQ(facts.leases,
+              (std::vector<Lease>{
+                  {.client = Client::Dhclient,
+                   .interfaceName = "eth1",
+                   .family = AF_INET,
+                   .address = "198.51.100.109",
+                   .server = "198.51.100.1",
+                   .clientAlive = true,
+                   .expires = 1795216696,
+                   .origin = root_.path("/var/lib/NetworkManager/dhclient-" + profile)},
+                  {.client = Client::Dhclient,
+                   .interfaceName = "eth1",
+                   .family = AF_INET6,
+                   .address = "2001:db8:99::1b0",
+                   .server = "",
+                   .expires = 1795216697,
+                   .origin = root_.path("/var/lib/NetworkManager/dhclient6-" + profile)}}));
+}
+
+TEST_F(DhclientTest, CapturedUnderIfupdown) {
+    root_.write("/var/lib/dhcp/dhclient.eth1.leases", sample("ifupdown/dhclient.eth1.leases"));
+    EXPECT_EQ(read().leases,
+              (std::vector<Lease>{{.client = Client::Dhclient,
+                                   .interfaceName = "eth1",
+                                   .family = AF_INET,
+                                   .address = "198.51.100.106",
+                                   .server = "198.51.100.1",
+                                   .expires = 1795216956,
+                                   .origin = root_.path("/var/lib/dhcp/dhclient.eth1.leases")}}));
 }
 
 TEST_F(DhclientTest, AClaimWithoutAnEndIsNone) {

@@ -10,6 +10,7 @@
 
 #include <memory>
 
+#include "Clients.h"
 #include "ScriptedTransport.h"
 #include "Support.h"
 #include "zrclient/LiveSource.h"
@@ -102,6 +103,49 @@ TEST_F(LiveMachineTest, CapturedReleaseLeavesTheOtherInterfaceItsServer) {
               PropertyValue{Servers{"198.51.100.1"}});
 }
 
+TEST_F(LiveMachineTest, CapturedDhcpcdLeaseLivesUntilItsEnd) {
+    root_.write("/var/lib/dhcpcd/eth1.lease", sample("dhcpcd-10/eth1.lease"));
+    root_.age("/var/lib/dhcpcd/eth1.lease", now_);
+    const std::vector<Step> leased = address(2, {198, 51, 100, 121});
+    LiveMachine& machine = open({links(1), leased, links(1), leased});
+    EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{"198.51.100.1"}});
+    now_ += 600;
+    EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{}});
+}
+
+TEST_F(LiveMachineTest, CapturedNetworkManagerStateOnItsLink) {
+    root_.write("/run/NetworkManager/devices/2",
+                sample("networkmanager-internal/run-NetworkManager-devices-2.txt"));
+    now_ = 1'795'216'300;
+    const auto tree = open({links(1), address(2, {198, 51, 100, 109})}).read();
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{"198.51.100.1"}});
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::AddressSource), number(1));
+}
+
+TEST_F(LiveMachineTest, CapturedBootpAtTheStartOfTheSystem) {
+    root_.write("/run/net-eth1.conf", sample("klibc-ipconfig/run-net-eth1.conf.bootp"));
+    const auto tree = open({links(1), address(2, {203, 0, 113, 140})}).read();
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::AddressSource), number(2));
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{"203.0.113.1"}});
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPEnabled), PropertyValue{false});
+}
+
+TEST_F(LiveMachineTest, WhatCannotBeReadIsARemark) {
+    std::filesystem::create_directories(root_.path("/run/net-eth1.conf"));
+    LiveMachine& machine =
+        open({links(1), address(2, {192, 0, 2, 1}), links(1), address(2, {192, 0, 2, 1})});
+    const auto tree = machine.read();
+    ASSERT_EQ(tree->remarks().size(), 1U);
+    EXPECT_THAT(tree->remarks()[0], HasSubstr("cannot read " + root_.path("/run/net-eth1.conf")));
+    std::filesystem::remove_all(root_.path("/run/net-eth1.conf"));
+    EXPECT_TRUE(machine.changed());
+    EXPECT_THAT(machine.read()->remarks(), IsEmpty());
+}
+
 TEST_F(LiveMachineTest, TheComputerHasTheHostsName) {
     const auto tree = open({links(1), address(2, {192, 0, 2, 1})}).read();
     const auto* const name = tree->find(0, Properties::Name);
@@ -161,21 +205,27 @@ TEST_F(LiveMachineTest, EveryPlaceThatItReadsIsWatched) {
         std::filesystem::create_directories(root_.path("/proc/") + process + "/ns");
         std::filesystem::create_symlink("net:[1]", root_.path("/proc/") + process + "/ns/net");
     }
+    root_.write("/etc/network/interfaces", "source interfaces.d/*\n");
     root_.write("/run/systemd/netif/links/2",
                 "ADMIN_STATE=configured\nNETWORK_FILE=/etc/systemd/network/a.network\n");
     std::deque<std::vector<Step>> answers;
-    for (int i = 0; i < 20; ++i) {
+    for (int i = 0; i < 100; ++i) {
         answers.push_back(links(1));
         answers.push_back(address(2, {192, 0, 2, 1}));
     }
     LiveMachine& machine = open(std::move(answers));
     static_cast<void>(machine.read());
     EXPECT_FALSE(machine.changed());
-    for (const char* file :
-         {"/run/systemd/netif/leases/2", "/run/systemd/netif/links/3", "/srv/own.leases",
-          "/var/lib/dhcp/dhclient.leases", "/var/lib/dhclient/dhclient--eth0.lease",
-          "/var/lib/NetworkManager/dhclient-1-eth1.lease", "/etc/systemd/network/a.network",
-          "/run/systemd/network/a.network.d/a.conf"}) {
+    std::vector<std::string> files{"/srv/own.leases", "/etc/systemd/network/a.network",
+                                   "/run/systemd/network/a.network.d/a.conf",
+                                   "/etc/network/interfaces.d/a"};
+    for (const ClientSource& source : clientSources()) {
+        for (const ClientPlace& place : source.places) {
+            files.push_back(std::string{place.directory} + '/' + std::string{place.namePrefix} +
+                            "x");
+        }
+    }
+    for (const std::string& file : files) {
         root_.write(file, "x");
         EXPECT_TRUE(machine.changed()) << file;
         static_cast<void>(machine.read());

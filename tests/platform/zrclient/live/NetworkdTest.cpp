@@ -107,10 +107,17 @@ TEST(NetworkdTimeSpan, WhatIsNoTimeSpanIsNone) {
 }
 
 TEST(NetworkFile, CapturedFiles) {
-    EXPECT_EQ(networkFile(sample("networkd/10-eth1.network")),
-              (NetworkFile{.dhcp4 = true, .dhcp6 = true, .linkLocal4 = true, .addresses = {}}));
+    EXPECT_EQ(networkFile(sample("networkd/10-eth1.network")), (NetworkFile{.dhcp4 = true,
+                                                                            .dhcp6 = true,
+                                                                            .linkLocal4 = true,
+                                                                            .addresses = {},
+                                                                            .matchName = "eth1"}));
     EXPECT_EQ(networkFile(sample("networkd-257/10-eth1.network")),
-              (NetworkFile{.dhcp4 = true, .dhcp6 = true, .linkLocal4 = false, .addresses = {}}));
+              (NetworkFile{.dhcp4 = true,
+                           .dhcp6 = true,
+                           .linkLocal4 = false,
+                           .addresses = {},
+                           .matchName = "eth1"}));
 }
 
 TEST(NetworkFile, AllSpellingsOfDhcp) {
@@ -181,21 +188,36 @@ TEST_F(NetworkdTest, AsItWasCaptured) {
     root_.write("/run/systemd/netif/leases/2", sample("networkd/run-systemd-netif-leases-2.txt"));
     root_.write("/etc/systemd/network/10-eth1.network", sample("networkd/10-eth1.network"));
     const ClientFacts facts = read();
-    EXPECT_EQ(facts.managements, (std::vector<Management>{{.client = Client::Networkd,
-                                                           .ifindex = 2,
-                                                           .dhcp4 = true,
-                                                           .dhcp6 = true,
-                                                           .staticAddresses = {},
-                                                           .linkLocal4 = true}}));
-    EXPECT_EQ(facts.leases, (std::vector<Lease>{{.client = Client::Networkd,
-                                                 .interfaceName = "",
-                                                 .ifindex = 2,
-                                                 .family = AF_INET,
-                                                 .address = "198.51.100.110",
-                                                 .server = "198.51.100.1",
-                                                 .clientAlive = true,
-                                                 .expires = std::nullopt}}));
+    EXPECT_EQ(facts.managements,
+              (std::vector<LinkConfiguration>{
+                  {.client = Client::Networkd,
+                   .ifindex = 2,
+                   .dhcp4 = true,
+                   .dhcp6 = true,
+                   .staticAddresses = {},
+                   .linkLocal4 = true,
+                   .origin = root_.path("/etc/systemd/network/10-eth1.network")}}));
+    EXPECT_EQ(facts.leases,
+              (std::vector<Lease>{{.client = Client::Networkd,
+                                   .interfaceName = "",
+                                   .ifindex = 2,
+                                   .family = AF_INET,
+                                   .address = "198.51.100.110",
+                                   .server = "198.51.100.1",
+                                   .clientAlive = true,
+                                   .expires = std::nullopt,
+                                   .origin = root_.path("/run/systemd/netif/leases/2")}}));
     EXPECT_THAT(facts.complaints, IsEmpty());
+}
+
+TEST_F(NetworkdTest, WhereItRunsForOtherLinksItsIndexesAreTheirs) {
+    link("2", sample("networkd/run-systemd-netif-links-2.txt"));
+    root_.write("/run/systemd/netif/leases/2", sample("networkd/run-systemd-netif-leases-2.txt"));
+    const ClientFacts facts =
+        readWith(readNetworkd, root_, running(Client::Networkd, ManagerProcess::Where::Elsewhere));
+    EXPECT_THAT(facts.managements, IsEmpty());
+    EXPECT_THAT(facts.leases, IsEmpty());
+    EXPECT_EQ(readWith(readNetworkd, root_, running(Client::Networkd)).leases.size(), 1U);
 }
 
 TEST_F(NetworkdTest, AnInfiniteLeaseNeverEnds) {

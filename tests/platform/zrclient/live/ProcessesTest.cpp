@@ -74,6 +74,53 @@ TEST_F(ProcessesTest, AnEndedClientKeepsItsNameOnly) {
     EXPECT_THAT(read().processes, IsEmpty());
 }
 
+TEST_F(ProcessesTest, EachClientIsKnownByItsName) {
+    const auto text = [](const char* characters, std::size_t size) {
+        return std::string{characters, size};
+    };
+    add("11", "dhcpcd", "dhcpcd: eth1 [ip4] [ip6]");
+    add("12", "udhcpc", text("udhcpc\0-i\0eth2\0", 15));
+    add("13", "busybox", text("busybox\0udhcpc\0-i\0eth3\0", 23));
+    add("14", "udhcpc6", text("udhcpc6\0-i\0eth4\0", 16));
+    add("15", "dhcp6c", text("dhcp6c\0eth5\0", 12));
+    add("16", "busybox", text("busybox\0sh\0", 11));
+    std::vector<std::tuple<Client, std::string, std::int32_t>> found;
+    for (const ClientProcess& process : read().processes) {
+        found.emplace_back(process.client, process.interfaces.at(0), process.pid);
+    }
+    EXPECT_THAT(found, testing::UnorderedElementsAre(std::tuple{Client::Dhcpcd, "eth1", 11},
+                                                     std::tuple{Client::Udhcpc, "eth2", 12},
+                                                     std::tuple{Client::Udhcpc, "eth3", 13},
+                                                     std::tuple{Client::Udhcpc, "eth4", 14},
+                                                     std::tuple{Client::Dhcp6c, "eth5", 15}));
+}
+
+TEST_F(ProcessesTest, ManagersAreToldWithWhereTheyRun) {
+    using Where = ManagerProcess::Where;
+    add("11", "systemd-network", "/lib/systemd/systemd-networkd");
+    add("12", "NetworkManager", "/usr/sbin/NetworkManager", "net:[2]");
+    add("13", "wickedd-dhcp4", "", nullptr);
+    EXPECT_THAT(
+        read().managers,
+        testing::UnorderedElementsAre(
+            ManagerProcess{.client = Client::Networkd, .where = Where::Here, .pid = 11},
+            ManagerProcess{.client = Client::NetworkManager, .where = Where::Elsewhere, .pid = 12},
+            ManagerProcess{.client = Client::Wicked, .where = Where::Unknown, .pid = 13}));
+}
+
+TEST_F(ProcessesTest, AClientWhoseNamespaceIsForbiddenIsReported) {
+    add("17", "dhclient", commandLine_);
+    if (::geteuid() == 0) {
+        GTEST_SKIP() << "nothing is forbidden to root; run this test as another user, too";
+    }
+    std::filesystem::permissions(proc_.path("/17/ns"), std::filesystem::perms::none);
+    const ClientFacts facts = read();
+    std::filesystem::permissions(proc_.path("/17/ns"), std::filesystem::perms::owner_all);
+    EXPECT_THAT(facts.processes, IsEmpty());
+    EXPECT_THAT(facts.complaints, ElementsAre("cannot tell the links of process 17 (dhclient): "
+                                              "Permission denied"));
+}
+
 TEST_F(ProcessesTest, WhatIsNoProcessIsNotLookedAt) {
     add("self", "dhclient", commandLine_);
     add("0", "dhclient", commandLine_);

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <fcntl.h>
 #include <linux/netlink.h>
 #include <linux/rtnetlink.h>
 #include <sys/stat.h>
@@ -17,6 +18,8 @@
 #include <string_view>
 #include <vector>
 
+#include "Lease.h"
+#include "Roots.h"
 #include "zrclient/Snapshot.h"
 #include "zrcommon/File.h"
 
@@ -62,10 +65,33 @@ class TemporaryDirectory {
     void append(std::string_view below, std::string_view content) const {
         std::ofstream{path(below), std::ios::binary | std::ios::app} << content;
     }
+    /// Lets a file have been written at a time, in seconds since the epoch.
+    void age(std::string_view below, std::int64_t seconds) const {
+        const timespec time{.tv_sec = seconds, .tv_nsec = 0};
+        const std::array<timespec, 2> times{time, time};
+        if (::utimensat(AT_FDCWD, path(below).c_str(), times.data(), 0) != 0) {
+            throw std::runtime_error("cannot age " + path(below));
+        }
+    }
 
   private:
     std::string path_;
 };
+
+/// What a reader adds to the facts, of the files laid out in a directory.
+inline ClientFacts readWith(void (*reader)(const Roots& roots, ClientFacts& facts),
+                            const TemporaryDirectory& root, ClientFacts facts = {}) {
+    reader({.files = root.path(), .proc = root.path("/proc")}, facts);
+    return facts;
+}
+
+/// Facts of a manager that runs.
+inline ClientFacts running(Client client,
+                           ManagerProcess::Where where = ManagerProcess::Where::Here) {
+    ClientFacts facts;
+    facts.managers = {{.client = client, .where = where, .pid = 7}};
+    return facts;
+}
 
 /// Builds the bytes of one netlink message.
 class Message {

@@ -43,4 +43,8 @@ std::optional<std::string> canonicalAddress(int family, std::string_view text) {
     return addressText(family, std::span{bytes}.first(addressLength(family)));
 }
 
+std::string canonicalIPv4(std::string_view text) {
+    return canonicalAddress(AF_INET, text.substr(0, text.find('/'))).value_or("");
+}
+
 }  // namespace ZR::Live

@@ -16,4 +16,8 @@ namespace ZR::Live {
 /// print as. nullopt when the text is no address of the family.
 [[nodiscard]] std::optional<std::string> canonicalAddress(int family, std::string_view text);
 
+/// The same of an IPv4 address, also with a prefix length behind a "/"; empty when the
+/// text is none.
+[[nodiscard]] std::string canonicalIPv4(std::string_view text);
+
 }  // namespace ZR::Live

@@ -1,13 +1,11 @@
 #include "Decide.h"
 
-#include <linux/if.h>
 #include <linux/if_addr.h>
 #include <linux/rtnetlink.h>
 #include <sys/socket.h>
 
 #include <algorithm>
 #include <array>
-#include <cstddef>
 #include <utility>
 
 #include "InterfaceRules.h"
@@ -17,13 +15,33 @@ namespace {
 
 using NodeLexicon::AddressSource;
 using NodeLexicon::Properties;
-using Answer = std::optional<PropertyValue>;
+using Answer = std::optional<Finding>;
 
 constexpr std::uint64_t interfaceNameMaxLength = 15;  // IFNAMSIZ without the NUL
 constexpr std::uint64_t hostNameMaxLength = 64;       // HOST_NAME_MAX of Linux
 
+constexpr std::string_view socketFile = "/proc/net/udp";
+
 PropertyValue source(AddressSource value) {
     return std::uint64_t{static_cast<unsigned int>(value)};
+}
+
+Finding kernel(PropertyValue value) {
+    return {.value = std::move(value)};
+}
+Finding from(const Lease& lease, PropertyValue value) {
+    return {.value = std::move(value), .origin = {.client = lease.client, .file = lease.origin}};
+}
+Finding from(const LinkConfiguration& configuration, PropertyValue value) {
+    return {.value = std::move(value),
+            .origin = {.client = configuration.client, .file = configuration.origin}};
+}
+Finding from(const ClientProcess& process, PropertyValue value) {
+    return {.value = std::move(value),
+            .origin = {.client = process.client, .file = {}, .pid = process.pid}};
+}
+Finding fromSocket(PropertyValue value) {
+    return {.value = std::move(value), .origin = {.client = {}, .file = socketFile}};
 }
 
 bool isUsableIPv4(const Address& address) {
@@ -34,10 +52,18 @@ template <typename Condition>
 Answer firstIPv4(const InterfaceView& view, Condition condition) {
     for (const Address& address : view.addresses) {
         if (isUsableIPv4(address) && condition(address)) {
-            return address.text;
+            return kernel(address.text);
         }
     }
     return std::nullopt;
+}
+
+bool hasEnd(const Address& address) {
+    return address.validLifetime != Address::infinite;
+}
+
+bool isPermanent(const Address& address) {
+    return (address.flags & IFA_F_PERMANENT) != 0;
 }
 
 bool isLinkLocal(const Address& address) {
@@ -53,20 +79,42 @@ const Lease* leaseOf(const InterfaceView& view) {
     return nullptr;
 }
 
-bool hasLeaseOf(const InterfaceView& view, Client client) {
-    return std::any_of(view.leases.begin(), view.leases.end(),
-                       [&](const Lease* lease) { return lease->client == client; });
+/// A DHCPv4 client that runs on the link; null for none.
+const ClientProcess* process4(const InterfaceView& view) {
+    const auto found = std::find_if(view.processes.begin(), view.processes.end(),
+                                    [](const ClientProcess* process) { return !process->ipv6; });
+    return found == view.processes.end() ? nullptr : *found;
 }
 
-bool managerWantsDhcp4(const InterfaceView& view) {
-    return view.management != nullptr && view.management->dhcp4.value_or(false);
+/// Whether a configuration asks for DHCP of either protocol; nullopt when it does not tell.
+std::optional<bool> wantsDhcp(const LinkConfiguration& configuration) {
+    if (configuration.dhcp4.value_or(false) || configuration.dhcp6.value_or(false)) {
+        return true;
+    }
+    return configuration.dhcp4;
+}
+
+/// What says how the link is to be configured: its manager, or else the files of such.
+const LinkConfiguration* intent(const InterfaceView& view) {
+    return view.management != nullptr && view.management->dhcp4 ? view.management
+                                                                : view.configuration;
+}
+
+bool names(const LinkConfiguration& configuration, const Address& address) {
+    const auto& told = configuration.staticAddresses;
+    return std::find(told.begin(), told.end(), address.text) != told.end();
+}
+
+AddressSource sourceOf(const Lease& lease) {
+    return lease.bootp ? AddressSource::BOOTP : AddressSource::DHCP;
 }
 
 /// Each server once, that of the interface's own address first. Where two clients
 /// claim one address, only the first is heard: the one that runs.
-std::vector<std::string> servers(const InterfaceView& view) {
+Answer servers(const InterfaceView& view) {
     std::vector<std::string> found;
     std::vector<std::string_view> heard;
+    const Lease* first = nullptr;
     const auto hear = [&](const Lease& lease) {
         if (std::find(heard.begin(), heard.end(), lease.address) != heard.end()) {
             return;
@@ -74,31 +122,39 @@ std::vector<std::string> servers(const InterfaceView& view) {
         heard.emplace_back(lease.address);
         if (!lease.server.empty() &&
             std::find(found.begin(), found.end(), lease.server) == found.end()) {
+            first = first == nullptr ? &lease : first;
             found.push_back(lease.server);
         }
     };
     if (const Lease* own = leaseOf(view)) {
         hear(*own);
     }
-    for (const Lease* lease : view.leases) {
-        hear(*lease);
+    for (const auto* leases : {&view.leases, &view.leases6}) {
+        for (const Lease* lease : *leases) {
+            hear(*lease);
+        }
     }
-    return found;
+    return first == nullptr ? Answer{} : from(*first, std::move(found));
 }
 
 constexpr std::array rows{
     DecisionRow{Properties::Name, "the kernel's name of the link",
-                [](const InterfaceView& view) -> Answer { return view.link->name; }},
-    DecisionRow{Properties::NameMaxLength, "the kernel takes no longer names",
-                [](const InterfaceView& /*view*/) -> Answer { return interfaceNameMaxLength; }},
+                [](const InterfaceView& view) -> Answer { return kernel(view.link->name); }},
+    DecisionRow{
+        Properties::NameMaxLength, "the kernel takes no longer names",
+        [](const InterfaceView& /*view*/) -> Answer { return kernel(interfaceNameMaxLength); }},
     DecisionRow{Properties::InterfaceState, "administrative and operational state of the link",
                 [](const InterfaceView& view) -> Answer {
-                    return std::uint64_t{isActive(*view.link) ? 1U : 0U};
+                    return kernel(std::uint64_t{isActive(*view.link) ? 1U : 0U});
                 }},
 
     DecisionRow{Properties::IPv4Address, "the address that a DHCP server leased",
                 [](const InterfaceView& view) -> Answer {
-                    return view.leases.empty() ? Answer{} : Answer{view.leases.front()->address};
+                    if (view.leases.empty()) {
+                        return std::nullopt;
+                    }
+                    const Lease& lease = *view.leases.front();
+                    return from(lease, lease.address);
                 }},
     DecisionRow{Properties::IPv4Address, "the first address of its network with global scope",
                 [](const InterfaceView& view) {
@@ -109,153 +165,213 @@ constexpr std::array rows{
                 }},
     DecisionRow{Properties::IPv4Address, "a further address, or one of the site's",
                 [](const InterfaceView& view) {
-                    return firstIPv4(view, [](const Address& address) {
-                        return address.scope == RT_SCOPE_UNIVERSE || address.scope == RT_SCOPE_SITE;
-                    });
+                    return firstIPv4(
+                        view, [](const Address& address) { return address.scope < RT_SCOPE_LINK; });
                 }},
-    DecisionRow{Properties::IPv4Address, "a link-local address is better than none",
+    DecisionRow{Properties::IPv4Address, "an address of the link only",
                 [](const InterfaceView& view) {
                     return firstIPv4(view, [](const Address& address) {
                         return address.scope == RT_SCOPE_LINK;
                     });
                 }},
 
-    DecisionRow{Properties::DHCPEnabled, "the master owns the addresses of its ports",
-                [](const InterfaceView& view) { return view.enslaved ? Answer{false} : Answer{}; }},
+    DecisionRow{
+        Properties::DHCPEnabled, "the master owns the addresses of its ports",
+        [](const InterfaceView& view) { return view.enslaved ? Answer{kernel(false)} : Answer{}; }},
     DecisionRow{Properties::DHCPEnabled, "the link's manager holds a lease",
-                [](const InterfaceView& view) {
-                    return view.management != nullptr && hasLeaseOf(view, view.management->client)
-                               ? Answer{true}
-                               : Answer{};
+                [](const InterfaceView& view) -> Answer {
+                    for (const Lease* lease : view.leases) {
+                        if (view.management != nullptr &&
+                            lease->client == view.management->client) {
+                            return from(*lease, true);
+                        }
+                    }
+                    return std::nullopt;
                 }},
     DecisionRow{Properties::DHCPEnabled, "the configuration of the link's manager",
                 [](const InterfaceView& view) -> Answer {
-                    if (view.management == nullptr || !view.management->dhcp4) {
-                        return std::nullopt;
-                    }
-                    return *view.management->dhcp4 || view.management->dhcp6.value_or(false);
+                    const auto wanted =
+                        view.management == nullptr ? std::nullopt : wantsDhcp(*view.management);
+                    return wanted ? Answer{from(*view.management, *wanted)} : Answer{};
                 }},
     DecisionRow{Properties::DHCPEnabled, "a client runs on the link",
+                [](const InterfaceView& view) -> Answer {
+                    return view.processes.empty() ? Answer{} : from(*view.processes.front(), true);
+                }},
+    DecisionRow{Properties::DHCPEnabled, "a client that runs holds a lease of the link",
+                [](const InterfaceView& view) -> Answer {
+                    // It may have been started under another name of the link.
+                    return !view.leases.empty() && view.leases.front()->clientAlive
+                               ? Answer{from(*view.leases.front(), true)}
+                               : Answer{};
+                }},
+    DecisionRow{Properties::DHCPEnabled, "somebody listens on the link's DHCP client port",
                 [](const InterfaceView& view) {
-                    return view.dhcp4Process || view.dhcp6Process ? Answer{true} : Answer{};
+                    return view.socket != nullptr || view.openSocket != nullptr
+                               ? Answer{fromSocket(true)}
+                               : Answer{};
+                }},
+    DecisionRow{Properties::DHCPEnabled, "the configuration that is kept for the link",
+                [](const InterfaceView& view) -> Answer {
+                    const auto wanted = view.configuration == nullptr
+                                            ? std::nullopt
+                                            : wantsDhcp(*view.configuration);
+                    return wanted ? Answer{from(*view.configuration, *wanted)} : Answer{};
                 }},
     DecisionRow{Properties::DHCPEnabled,
                 "an IPv4 address with an end: somebody renews it, and only DHCP does",
                 [](const InterfaceView& view) {
-                    return firstIPv4(view,
-                                     [](const Address& address) {
-                                         return address.validLifetime != Address::infinite;
-                                     })
-                               ? Answer{true}
-                               : Answer{};
+                    return firstIPv4(view, hasEnd) ? Answer{kernel(true)} : Answer{};
                 }},
     DecisionRow{Properties::DHCPEnabled, "nothing speaks for DHCP",
-                [](const InterfaceView& /*view*/) -> Answer { return false; }},
+                [](const InterfaceView& /*view*/) -> Answer { return kernel(false); }},
 
     DecisionRow{Properties::AddressSource, "the master owns the addresses of its ports",
                 [](const InterfaceView& view) {
-                    return view.enslaved ? Answer{source(AddressSource::Unknown)} : Answer{};
+                    return view.enslaved ? Answer{kernel(source(AddressSource::Unknown))}
+                                         : Answer{};
                 }},
     DecisionRow{Properties::AddressSource, "a live lease names this very address",
                 [](const InterfaceView& view) -> Answer {
                     const Lease* const lease = leaseOf(view);
-                    if (lease == nullptr) {
-                        return std::nullopt;
-                    }
-                    return source(lease->bootp ? AddressSource::BOOTP : AddressSource::DHCP);
+                    return lease == nullptr ? Answer{} : from(*lease, source(sourceOf(*lease)));
                 }},
     DecisionRow{Properties::AddressSource, "the link's manager was told this very address",
                 [](const InterfaceView& view) -> Answer {
-                    if (view.management == nullptr || view.address == nullptr) {
-                        return std::nullopt;
-                    }
-                    const auto& told = view.management->staticAddresses;
-                    return std::find(told.begin(), told.end(), view.address->text) != told.end()
-                               ? Answer{source(AddressSource::Static)}
+                    return view.management != nullptr && view.address != nullptr &&
+                                   names(*view.management, *view.address)
+                               ? Answer{from(*view.management, source(AddressSource::Static))}
                                : Answer{};
                 }},
     DecisionRow{Properties::AddressSource, "169.254/16 with link scope (RFC 3927)",
                 [](const InterfaceView& view) {
                     return view.address != nullptr && isLinkLocal(*view.address)
-                               ? Answer{source(AddressSource::LinkLocal)}
+                               ? Answer{kernel(source(AddressSource::LinkLocal))}
+                               : Answer{};
+                }},
+    DecisionRow{Properties::AddressSource, "the link's manager uses the address for others",
+                [](const InterfaceView& view) -> Answer {
+                    return view.management != nullptr && view.address != nullptr &&
+                                   view.management->other4
+                               ? Answer{from(*view.management, source(AddressSource::Other))}
+                               : Answer{};
+                }},
+    DecisionRow{Properties::AddressSource, "a DHCP client listens at this very address",
+                [](const InterfaceView& view) {
+                    return view.address != nullptr && view.socket != nullptr &&
+                                   view.socket->address == view.address->text
+                               ? Answer{fromSocket(source(AddressSource::DHCP))}
                                : Answer{};
                 }},
     DecisionRow{Properties::AddressSource,
                 "an IPv4 address with an end: somebody renews it, and only DHCP does",
                 [](const InterfaceView& view) {
-                    return view.address != nullptr &&
-                                   view.address->validLifetime != Address::infinite
-                               ? Answer{source(AddressSource::DHCP)}
+                    return view.address != nullptr && hasEnd(*view.address)
+                               ? Answer{kernel(source(AddressSource::DHCP))}
+                               : Answer{};
+                }},
+    DecisionRow{
+        Properties::AddressSource, "set once at the start of the system, and left as it is since",
+        [](const InterfaceView& view) -> Answer {
+            return view.address != nullptr && view.formerLease != nullptr &&
+                           view.formerLease->address == view.address->text
+                       ? Answer{from(*view.formerLease, source(sourceOf(*view.formerLease)))}
+                       : Answer{};
+        }},
+    DecisionRow{Properties::AddressSource, "udhcpc runs, which sets addresses without an end",
+                [](const InterfaceView& view) -> Answer {
+                    const ClientProcess* const process = process4(view);
+                    return view.address != nullptr && isPermanent(*view.address) &&
+                                   process != nullptr && process->client == Client::Udhcpc
+                               ? Answer{from(*process, source(AddressSource::DHCP))}
+                               : Answer{};
+                }},
+    DecisionRow{Properties::AddressSource, "the configuration names this very address",
+                [](const InterfaceView& view) -> Answer {
+                    return view.configuration != nullptr && view.address != nullptr &&
+                                   names(*view.configuration, *view.address)
+                               ? Answer{from(*view.configuration, source(AddressSource::Static))}
+                               : Answer{};
+                }},
+    DecisionRow{Properties::AddressSource,
+                "the configuration that is kept for the link, which no manager has",
+                [](const InterfaceView& view) -> Answer {
+                    if (view.configuration == nullptr || view.management != nullptr ||
+                        view.address == nullptr) {
+                        return std::nullopt;
+                    }
+                    const LinkConfiguration& configuration = *view.configuration;
+                    if (configuration.dhcp4.value_or(false)) {
+                        return from(configuration, source(AddressSource::DHCP));
+                    }
+                    if (configuration.bootp4) {
+                        return from(configuration, source(AddressSource::BOOTP));
+                    }
+                    return configuration.other4
+                               ? Answer{from(configuration, source(AddressSource::Other))}
                                : Answer{};
                 }},
     DecisionRow{Properties::AddressSource, "permanent, and no DHCPv4 client that could have set it",
                 [](const InterfaceView& view) {
-                    return view.address != nullptr &&
-                                   (view.address->flags & IFA_F_PERMANENT) != 0 &&
-                                   !view.dhcp4Process && !managerWantsDhcp4(view)
-                               ? Answer{source(AddressSource::Static)}
+                    const bool managerWantsDhcp =
+                        view.management != nullptr && view.management->dhcp4.value_or(false);
+                    return view.address != nullptr && isPermanent(*view.address) &&
+                                   process4(view) == nullptr && !managerWantsDhcp
+                               ? Answer{kernel(source(AddressSource::Static))}
                                : Answer{};
                 }},
     DecisionRow{Properties::AddressSource, "an address that nobody speaks for",
                 [](const InterfaceView& view) {
-                    return view.address != nullptr ? Answer{source(AddressSource::Unknown)}
+                    return view.address != nullptr ? Answer{kernel(source(AddressSource::Unknown))}
                                                    : Answer{};
                 }},
-    DecisionRow{Properties::AddressSource, "no address yet: DHCP is what is meant to give one",
-                [](const InterfaceView& view) {
-                    return view.dhcp4Process || managerWantsDhcp4(view)
-                               ? Answer{source(AddressSource::DHCP)}
-                               : Answer{};
+    DecisionRow{Properties::AddressSource, "no address yet: a DHCP client is to give one",
+                [](const InterfaceView& view) -> Answer {
+                    const ClientProcess* const process = process4(view);
+                    return process != nullptr ? Answer{from(*process, source(AddressSource::DHCP))}
+                                              : Answer{};
                 }},
-    DecisionRow{Properties::AddressSource, "no address yet: the manager was told one",
-                [](const InterfaceView& view) {
-                    return view.management != nullptr && !view.management->staticAddresses.empty()
-                               ? Answer{source(AddressSource::Static)}
-                               : Answer{};
+    DecisionRow{Properties::AddressSource, "no address yet: what is meant to give one",
+                [](const InterfaceView& view) -> Answer {
+                    const LinkConfiguration* const meant = intent(view);
+                    if (meant == nullptr) {
+                        return std::nullopt;
+                    }
+                    if (meant->dhcp4.value_or(false)) {
+                        return from(*meant, source(AddressSource::DHCP));
+                    }
+                    if (meant->bootp4) {
+                        return from(*meant, source(AddressSource::BOOTP));
+                    }
+                    if (!meant->staticAddresses.empty()) {
+                        return from(*meant, source(AddressSource::Static));
+                    }
+                    if (meant->linkLocal4) {
+                        return from(*meant, source(AddressSource::LinkLocal));
+                    }
+                    return meant->other4 ? Answer{from(*meant, source(AddressSource::Other))}
+                                         : Answer{};
                 }},
-    DecisionRow{Properties::AddressSource, "no address yet: the manager will choose one",
-                [](const InterfaceView& view) {
-                    return view.management != nullptr && view.management->linkLocal4
-                               ? Answer{source(AddressSource::LinkLocal)}
-                               : Answer{};
+    DecisionRow{Properties::AddressSource, "no address, and nobody means to give one",
+                [](const InterfaceView& /*view*/) -> Answer {
+                    return kernel(source(AddressSource::Unknown));
                 }},
-    DecisionRow{
-        Properties::AddressSource, "no address, and nobody means to give one",
-        [](const InterfaceView& /*view*/) -> Answer { return source(AddressSource::Unknown); }},
 
     DecisionRow{Properties::DHCPServerAddresses, "the master owns the addresses of its ports",
                 [](const InterfaceView& view) {
-                    return view.enslaved ? Answer{std::vector<std::string>{}} : Answer{};
+                    return view.enslaved ? Answer{kernel(std::vector<std::string>{})} : Answer{};
                 }},
-    DecisionRow{Properties::DHCPServerAddresses, "the server identifiers of the live leases",
-                [](const InterfaceView& view) -> Answer { return servers(view); }},
+    DecisionRow{Properties::DHCPServerAddresses, "the servers of the live leases", servers},
+    DecisionRow{Properties::DHCPServerAddresses, "the one that the link's DHCP client talks to",
+                [](const InterfaceView& view) {
+                    return view.socket != nullptr && !view.socket->peer.empty()
+                               ? Answer{fromSocket(std::vector{view.socket->peer})}
+                               : Answer{};
+                }},
+    DecisionRow{
+        Properties::DHCPServerAddresses, "nobody tells of a server",
+        [](const InterfaceView& /*view*/) -> Answer { return kernel(std::vector<std::string>{}); }},
 };
-
-bool isLive(const Lease& lease, const InterfaceView& view, std::int64_t now) {
-    return !lease.released && (!lease.expires || *lease.expires > now) &&
-           std::any_of(view.addresses.begin(), view.addresses.end(), [&](const Address& address) {
-               return address.family == lease.family && address.text == lease.address;
-           });
-}
-
-/// Keeps the kernel's order among equals, which is the order of precedence of the
-/// addresses of one link.
-template <typename Fact>
-void sortByIndex(std::vector<Fact>& facts) {
-    const auto before = [](const Fact& a, const Fact& b) { return a.ifindex < b.ifindex; };
-    // Most dumps come in order already.
-    if (!std::is_sorted(facts.begin(), facts.end(), before)) {
-        std::stable_sort(facts.begin(), facts.end(), before);
-    }
-}
-
-bool concerns(const ClientProcess& process, const Link& link) {
-    if (process.interfaces.empty()) {
-        return (link.flags & IFF_BROADCAST) != 0;
-    }
-    return std::find(process.interfaces.begin(), process.interfaces.end(), link.name) !=
-           process.interfaces.end();
-}
 
 }  // namespace
 
@@ -263,113 +379,47 @@ std::span<const DecisionRow> precedence() {
     return rows;
 }
 
-Machine::Machine(MachineFacts facts, std::int64_t now) : facts_(std::move(facts)) {
-    auto& links = facts_.links;
-    auto& addresses = facts_.addresses;
-    sortByIndex(links);
-    sortByIndex(addresses);
-    views_.reserve(links.size());
-    auto address = addresses.begin();
-    for (const Link& link : links) {
-        const auto first = std::find_if(address, addresses.end(), [&](const Address& candidate) {
-            return candidate.ifindex >= link.ifindex;
-        });
-        const auto last = std::find_if(first, addresses.end(), [&](const Address& candidate) {
-            return candidate.ifindex != link.ifindex;
-        });
-        address = last;
-        if (isNetworkInterface(link, first != last)) {
-            views_.push_back({.link = &link,
-                              .addresses = {first, last},
-                              .leases = {},
-                              .enslaved = isEnslaved(link)});
-        }
+std::string describe(const Origin& origin) {
+    std::string text{origin.client ? nameOf(*origin.client) : std::string_view{}};
+    if (origin.pid != 0) {
+        text += ", process " + std::to_string(origin.pid);
     }
-    byName_.resize(views_.size());
-    for (std::size_t i = 0; i < byName_.size(); ++i) {
-        byName_[i] = i;
+    if (!origin.file.empty()) {
+        text += text.empty() ? "" : " ";
+        text += origin.file;
     }
-    std::sort(byName_.begin(), byName_.end(), [&](std::size_t a, std::size_t b) {
-        return views_[a].link->name < views_[b].link->name;
-    });
-    collectLeases(now);
-    collectClients();
+    return text.empty() ? "kernel" : text;
 }
 
-void Machine::collectLeases(std::int64_t now) {
-    for (const Lease& lease : facts_.leases) {
-        InterfaceView* const view =
-            lease.ifindex != 0 ? find(lease.ifindex) : find(lease.interfaceName);
-        const bool namesBoth = lease.ifindex != 0 && !lease.interfaceName.empty();
-        if (view == nullptr || (namesBoth && view->link->name != lease.interfaceName)) {
-            continue;
-        }
-        if (lease.family == AF_INET && isLive(lease, *view, now)) {
-            view->leases.push_back(&lease);
-        }
-    }
-    for (InterfaceView& view : views_) {
-        std::stable_partition(view.leases.begin(), view.leases.end(),
-                              [](const Lease* lease) { return lease->clientAlive; });
-    }
-}
-
-void Machine::collectClients() {
-    for (const Management& management : facts_.managements) {
-        if (InterfaceView* const view = find(management.ifindex)) {
-            view->management = &management;
-        }
-    }
-    for (const ClientProcess& process : facts_.processes) {
-        for (InterfaceView& view : views_) {
-            if (concerns(process, *view.link)) {
-                (process.ipv6 ? view.dhcp6Process : view.dhcp4Process) = true;
-            }
-        }
-    }
-}
-
-InterfaceView* Machine::find(std::uint32_t ifindex) {
-    const auto found = std::lower_bound(views_.begin(), views_.end(), ifindex,
-                                        [](const InterfaceView& view, std::uint32_t wanted) {
-                                            return view.link->ifindex < wanted;
-                                        });
-    return found != views_.end() && found->link->ifindex == ifindex ? &*found : nullptr;
-}
-
-InterfaceView* Machine::find(std::string_view name) {
-    const auto found = std::lower_bound(byName_.begin(), byName_.end(), name,
-                                        [&](std::size_t position, std::string_view wanted) {
-                                            return views_[position].link->name < wanted;
-                                        });
-    return found != byName_.end() && views_[*found].link->name == name ? &views_[*found] : nullptr;
-}
-
-std::vector<Decision> Machine::decide(InterfaceView view) {
+std::vector<Decision> decide(InterfaceView view) {
     std::vector<Decision> decisions;
     decisions.reserve(NodeLexicon::properties.size());
     for (const DecisionRow& row : rows) {
         if (!decisions.empty() && decisions.back().property == row.property) {
             continue;
         }
-        auto value = row.answer(view);
-        if (!value) {
+        auto finding = row.answer(view);
+        if (!finding) {
             continue;
         }
         if (row.property == Properties::IPv4Address) {
             // The rows below speak about this very address.
-            const auto address = std::find_if(
-                view.addresses.begin(), view.addresses.end(), [&](const Address& candidate) {
-                    return candidate.family == AF_INET && *value == PropertyValue{candidate.text};
+            const auto* const text = std::get_if<std::string>(&finding->value);
+            const auto own = std::find_if(
+                view.addresses.begin(), view.addresses.end(), [&](const Address& address) {
+                    return address.family == AF_INET && address.text == *text;
                 });
-            view.address = address != view.addresses.end() ? &*address : nullptr;
+            view.address = own == view.addresses.end() ? nullptr : &*own;
         }
-        decisions.push_back({row.property, *std::move(value), row.reason});
+        decisions.push_back({.property = row.property,
+                             .value = std::move(finding->value),
+                             .reason = row.reason,
+                             .origin = finding->origin});
     }
     return decisions;
 }
 
-std::shared_ptr<const Snapshot> decide(MachineFacts facts, std::int64_t now) {
+std::shared_ptr<const Snapshot> decide(MachineFacts facts, std::int64_t now, Explain explain) {
     const Machine machine{std::move(facts), now};
     SnapshotBuilder builder;
     const auto computer = builder.add(Snapshot::none, "ComputerSystem", "Computer");
@@ -378,15 +428,21 @@ std::shared_ptr<const Snapshot> decide(MachineFacts facts, std::int64_t now) {
     const auto network = builder.add(computer, "Network", "Network");
     for (const InterfaceView& view : machine.interfaces()) {
         builder.add(network, "NetworkInterface", std::string{describe(*view.link)});
-        for (Decision& decision : Machine::decide(view)) {
+        for (Decision& decision : decide(view)) {
             // A link can be renamed, but not by a client of this tree: the kernel forgets
             // the new name at the next start, and leases and settings are found by name.
             const bool readOnly = decision.property == Properties::Name;
             builder.property(decision.property, std::move(decision.value), readOnly);
+            if (explain == Explain::Yes) {
+                builder.origin(describe(decision.origin) + ": " + std::string{decision.reason});
+            }
         }
     }
     if (machine.serviceProcessor()) {
         addServiceProcessor(*machine.serviceProcessor(), builder);
+    }
+    for (const std::string& complaint : machine.complaints()) {
+        builder.remark(complaint);
     }
     return builder.build();
 }

@@ -163,7 +163,8 @@ void addLeases(const LeaseFile& file, ClientFacts& facts) {
                  .bootp = lease.bootp,
                  .released = lease.released,
                  .clientAlive = alive,
-                 .expires = address.expires});
+                 .expires = address.expires,
+                 .origin = file.path});
         }
     }
 }

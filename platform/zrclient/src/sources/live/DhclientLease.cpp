@@ -12,20 +12,10 @@
 #include "AddressText.h"
 #include "Lease.h"
 #include "Link.h"
+#include "Numbers.h"
 
 namespace ZR::Live {
 namespace {
-
-template <typename Number>
-std::optional<Number> number(std::string_view text) {
-    Number value{};
-    const char* const end = text.data() + text.size();
-    const auto result = std::from_chars(text.data(), end, value);
-    if (text.empty() || result.ec != std::errc{} || result.ptr != end) {
-        return std::nullopt;
-    }
-    return value;
-}
 
 /// Splits "a/b/c" or "a:b:c" into its numbers.
 std::optional<std::array<int, 3>> threeNumbers(std::string_view text, char separator) {
@@ -36,7 +26,7 @@ std::optional<std::array<int, 3>> threeNumbers(std::string_view text, char separ
         if (end == std::string_view::npos) {
             return std::nullopt;
         }
-        const auto value = number<int>(text.substr(0, end));
+        const auto value = parseNumber<int>(text.substr(0, end));
         if (!value) {
             return std::nullopt;
         }
@@ -52,7 +42,7 @@ std::optional<std::int64_t> parseTime(const std::vector<std::string>& words) {
         return Lease::never;
     }
     if (words.size() >= 2 && words[0] == "epoch") {
-        return number<std::int64_t>(words[1]);
+        return parseNumber<std::int64_t>(words[1]);
     }
     if (words.size() < 3) {
         return std::nullopt;
@@ -325,7 +315,7 @@ class LeaseFile {
                            : skipBlock();
             }
             if (statement.keyword() == "starts") {
-                starts = number<std::int64_t>(statement.word(1));
+                starts = parseNumber<std::int64_t>(statement.word(1));
             }
             return true;
         });
@@ -339,9 +329,9 @@ class LeaseFile {
                 return skipBlock();
             }
             if (statement.keyword() == "starts") {
-                starts = number<std::int64_t>(statement.word(1));
+                starts = parseNumber<std::int64_t>(statement.word(1));
             } else if (statement.keyword() == "max-life") {
-                lifetime = number<std::uint32_t>(statement.word(1));
+                lifetime = parseNumber<std::uint32_t>(statement.word(1));
             }
             return true;
         });

@@ -10,7 +10,22 @@
 namespace ZR::Live {
 
 /// The programs whose traces are read. One source file each.
-enum class Client : std::uint8_t { Networkd, Dhclient };
+enum class Client : std::uint8_t {
+    Networkd,
+    NetworkManager,
+    Wicked,
+    Dhclient,
+    Dhcpcd,
+    Udhcpc,
+    Dhcp6c,
+    Ipconfig,
+    Netplan,
+    Ifupdown,
+    Ifcfg,
+};
+
+/// The name by which people know a program.
+[[nodiscard]] std::string_view nameOf(Client client) noexcept;
 
 /// One client's claim that an address of a link was leased. A claim proves
 /// nothing by itself: files outlive clients, addresses and links.
@@ -30,20 +45,28 @@ struct Lease {
     /// End in seconds since the epoch; nullopt when the client keeps only a
     /// duration, and takes the claim back itself.
     std::optional<std::int64_t> expires;
+    /// The client asked once and ended: after its end, too, the address stays as it is.
+    bool outlivesEnd = false;
+    std::string origin{};  ///< the file that says so
 
     bool operator==(const Lease&) const = default;
 };
 
-/// What a program that manages a link says about how it configures it.
-struct Management {
+/// What a program that manages a link, or a configuration file for such a program,
+/// says about how the link gets its addresses. It names the link by index or by name.
+struct LinkConfiguration {
     Client client{};
-    std::uint32_t ifindex = 0;
-    std::optional<bool> dhcp4;  ///< nullopt when its configuration cannot be read
+    std::uint32_t ifindex = 0;    ///< 0 when it names the link by name
+    std::string interfaceName{};  ///< empty when it names the link by index
+    std::optional<bool> dhcp4;    ///< nullopt when it does not tell, or cannot be read
     std::optional<bool> dhcp6;
     std::vector<std::string> staticAddresses;  ///< IPv4, canonical text
     bool linkLocal4 = false;                   ///< takes an address of 169.254/16 (RFC 3927)
+    bool bootp4 = false;                       ///< asks by BOOTP (RFC 951), without DHCP
+    bool other4 = false;                       ///< by another protocol, or shares the link
+    std::string origin{};                      ///< the file that says so
 
-    bool operator==(const Management&) const = default;
+    bool operator==(const LinkConfiguration&) const = default;
 };
 
 /// A running DHCP client of this network namespace.
@@ -55,6 +78,25 @@ struct ClientProcess {
     std::int32_t pid = 0;                 ///< process number; 0 before it is known
 
     bool operator==(const ClientProcess&) const = default;
+};
+
+/// A running program that manages links, of this network namespace or another.
+struct ManagerProcess {
+    enum class Where : std::uint8_t { Here, Elsewhere, Unknown };
+
+    Client client{};
+    Where where = Where::Unknown;
+    std::int32_t pid = 0;
+
+    bool operator==(const ManagerProcess&) const = default;
+};
+
+/// A UDP socket on the port of DHCP clients (68, RFC 2131 section 4.1).
+struct PortSocket {
+    std::string address;  ///< canonical IPv4 text; empty: of all links
+    std::string peer;     ///< the one address that it talks to; empty for none
+
+    bool operator==(const PortSocket&) const = default;
 };
 
 /// A directory that was read: all its files, or those of a name prefix.
@@ -73,10 +115,18 @@ struct WatchedPlace {
 /// Everything that the clients' traces say.
 struct ClientFacts {
     std::vector<Lease> leases;
-    std::vector<Management> managements;
+    std::vector<LinkConfiguration> managements;     ///< of programs that run now
+    std::vector<LinkConfiguration> configurations;  ///< of files that such programs would read
     std::vector<ClientProcess> processes;
-    std::vector<WatchedPlace> places;  ///< what was read beyond the fixed places
+    std::vector<ManagerProcess> managers;
+    std::vector<PortSocket> sockets;
+    std::vector<std::uint32_t> packetLinks;  ///< where a packet socket hears IPv4
+    std::vector<WatchedPlace> places;        ///< what was read beyond the fixed places
     std::vector<std::string> complaints;
+
+    /// Whether a program that manages links runs for this network namespace. One
+    /// whose namespace is hidden is believed: the files that it left are beside ours.
+    [[nodiscard]] bool runs(Client client) const noexcept;
 
     bool operator==(const ClientFacts&) const = default;
 };

@@ -4,14 +4,12 @@
 #include <unistd.h>
 
 #include <algorithm>
-#include <array>
+#include <iterator>
 #include <utility>
 
+#include "Clients.h"
 #include "Decide.h"
-#include "Dhclient.h"
 #include "IpmiDevice.h"
-#include "Networkd.h"
-#include "Processes.h"
 #include "tklogger/TKLogger.h"
 #include "zrclient/LiveSource.h"
 #include "zrcommon/SystemName.h"
@@ -28,17 +26,13 @@ constexpr std::chrono::milliseconds kernelTime{150};
 // watched before they are read.
 constexpr int clientRounds = 3;
 
-/// Who reads the traces of clients, in the order in which their claims are heard.
-/// Processes go first: their arguments name files.
-constexpr std::array clientReaders{readProcesses, readNetworkd, readDhclient};
-
 std::vector<WatchedPlace> fixedPlaces(const Roots& roots) {
-    std::vector<WatchedPlace> places{
-        {.directory = roots.path(networkdLinksDirectory), .namePrefix = ""},
-        {.directory = roots.path(networkdLeasesDirectory), .namePrefix = ""}};
-    for (const DhclientDirectory& directory : dhclientDirectories) {
-        places.push_back({.directory = roots.path(directory.path),
-                          .namePrefix = std::string{dhclientNamePrefix}});
+    std::vector<WatchedPlace> places;
+    for (const ClientSource& source : clientSources()) {
+        for (const ClientPlace& place : source.places) {
+            places.push_back({.directory = roots.path(place.directory),
+                              .namePrefix = std::string{place.namePrefix}});
+        }
     }
     return places;
 }
@@ -84,48 +78,50 @@ bool LiveMachine::changed() {
 }
 
 std::shared_ptr<const Snapshot> LiveMachine::read() {
-    std::vector<std::string> complaints;
-    ClientFacts clients = readClients(complaints);
+    ClientFacts clients = readClients();
     NetworkState network = reader_.read(std::chrono::steady_clock::now() + kernelTime);
-    std::move(network.complaints.begin(), network.complaints.end(), std::back_inserter(complaints));
+    std::move(network.complaints.begin(), network.complaints.end(),
+              std::back_inserter(clients.complaints));
     if (!network.certain) {
         monitor_.markChanged();
     }
     if (surroundings_.realProcesses) {
-        watchProcesses(clients.processes);
+        watchProcesses(clients);
     }
     markWireless(surroundings_.roots, network.links);
-    std::optional<ServiceProcessor> processor = processor_.read(complaints);
-    report(std::move(complaints));
+    std::optional<ServiceProcessor> processor = processor_.read(clients.complaints);
+    report(clients.complaints);
     return decide({.hostName = getSystemName(),
                    .links = std::move(network.links),
                    .addresses = std::move(network.addresses),
-                   .leases = std::move(clients.leases),
-                   .managements = std::move(clients.managements),
-                   .processes = std::move(clients.processes),
+                   .clients = std::move(clients),
                    .serviceProcessor = std::move(processor)},
-                  surroundings_.now());
+                  surroundings_.now(), surroundings_.explain);
 }
 
-/// A client that ends may leave everything else as it was.
-void LiveMachine::watchProcesses(const std::vector<ClientProcess>& processes) {
+/// A program that ends may leave everything else as it was.
+void LiveMachine::watchProcesses(const ClientFacts& clients) {
     std::vector<std::int32_t> pids;
-    pids.reserve(processes.size());
-    for (const ClientProcess& process : processes) {
+    pids.reserve(clients.processes.size() + clients.managers.size());
+    for (const ClientProcess& process : clients.processes) {
         pids.push_back(process.pid);
+    }
+    for (const ManagerProcess& manager : clients.managers) {
+        if (manager.where != ManagerProcess::Where::Elsewhere) {
+            pids.push_back(manager.pid);
+        }
     }
     monitor_.watchProcesses(pids);
 }
 
 /// Watches first and reads then, until nothing was read that was not watched.
-ClientFacts LiveMachine::readClients(std::vector<std::string>& complaints) {
+ClientFacts LiveMachine::readClients() {
     ClientFacts facts;
     for (int round = 0; round < clientRounds; ++round) {
-        complaints.clear();
-        monitor_.begin(places_, complaints);
         facts = {};
-        for (const auto reader : clientReaders) {
-            reader(surroundings_.roots, facts);
+        monitor_.begin(places_, facts.complaints);
+        for (const ClientSource& source : clientSources()) {
+            source.read(surroundings_.roots, facts);
         }
         std::vector<WatchedPlace> wanted = fixedPlaces(surroundings_.roots);
         for (WatchedPlace& place : facts.places) {
@@ -138,33 +134,32 @@ ClientFacts LiveMachine::readClients(std::vector<std::string>& complaints) {
                         [&](const WatchedPlace& place) { return isCovered(places_, place); });
         places_ = std::move(wanted);
         if (watched) {
-            std::move(facts.complaints.begin(), facts.complaints.end(),
-                      std::back_inserter(complaints));
             return facts;
         }
     }
     monitor_.markChanged();
-    std::move(facts.complaints.begin(), facts.complaints.end(), std::back_inserter(complaints));
     return facts;
 }
 
 /// Reports what the last reading did not complain about: a lasting trouble is one
 /// line, however often the machine is read.
-void LiveMachine::report(std::vector<std::string> complaints) {
+void LiveMachine::report(const std::vector<std::string>& complaints) {
     for (const std::string& complaint : complaints) {
         if (std::find(reported_.begin(), reported_.end(), complaint) == reported_.end()) {
             surroundings_.complain(complaint);
         }
     }
-    reported_ = std::move(complaints);
+    reported_ = complaints;
 }
 
 }  // namespace ZR::Live
 
 namespace ZR {
 
-std::unique_ptr<SnapshotSource> openLiveSource() {
-    return std::make_unique<Live::LiveMachine>(Live::Surroundings{});
+std::unique_ptr<SnapshotSource> openLiveSource(Explain explain) {
+    Live::Surroundings surroundings;
+    surroundings.explain = explain;
+    return std::make_unique<Live::LiveMachine>(std::move(surroundings));
 }
 
 }  // namespace ZR

@@ -13,6 +13,7 @@
 #include "NetlinkTransport.h"
 #include "Roots.h"
 #include "RtnetlinkReader.h"
+#include "zrclient/LiveSource.h"
 #include "zrclient/SnapshotSource.h"
 
 namespace ZR::Live {
@@ -32,6 +33,7 @@ struct Surroundings {
     /// The way to the service processor; null: the device of the machine at `roots`.
     std::unique_ptr<IpmiTransport> ipmi = nullptr;
     IpmiReader::Clock uptime = std::chrono::steady_clock::now;
+    Explain explain = Explain::No;
     /// Takes what could not be read, or not for certain.
     std::function<void(std::string_view)> complain;
 };
@@ -45,9 +47,9 @@ class LiveMachine final : public SnapshotSource {
     [[nodiscard]] std::shared_ptr<const Snapshot> read() override;
 
   private:
-    [[nodiscard]] ClientFacts readClients(std::vector<std::string>& complaints);
-    void watchProcesses(const std::vector<ClientProcess>& processes);
-    void report(std::vector<std::string> complaints);
+    [[nodiscard]] ClientFacts readClients();
+    void watchProcesses(const ClientFacts& clients);
+    void report(const std::vector<std::string>& complaints);
 
     Surroundings surroundings_;
     RtnetlinkReader reader_;

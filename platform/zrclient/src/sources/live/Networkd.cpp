@@ -3,13 +3,14 @@
 #include <sys/socket.h>
 
 #include <algorithm>
-#include <charconv>
 #include <cstddef>
 #include <map>
 #include <utility>
 
 #include "AddressText.h"
 #include "Files.h"
+#include "KeyFile.h"
+#include "Numbers.h"
 #include "zrcommon/PropertyFile.h"
 #include "zrcommon/Strings.h"
 
@@ -37,21 +38,6 @@ constexpr std::uint64_t infiniteOnTheWire = UINT32_MAX;
 
 constexpr std::string_view digits = "0123456789";
 constexpr std::string_view blanks = " \t";
-
-template <typename Number>
-std::optional<Number> number(std::string_view text) {
-    Number value{};
-    const char* const end = text.data() + text.size();
-    const auto result = std::from_chars(text.data(), end, value);
-    if (text.empty() || result.ec != std::errc{} || result.ptr != end) {
-        return std::nullopt;
-    }
-    return value;
-}
-
-std::string canonicalIPv4(std::string_view text) {
-    return canonicalAddress(AF_INET, text).value_or("");
-}
 
 /// Whether a value is a spelling of true, of false, or of neither.
 std::optional<bool> truth(std::string_view value) {
@@ -101,7 +87,9 @@ void applyAddress(std::string_view section, std::string_view value, NetworkFile&
 
 void applySetting(std::string_view section, std::string_view key, std::string_view value,
                   NetworkFile& settings) {
-    if (key == "Address" && (section == "Network" || section == "Address")) {
+    if (section == "Match" && key == "Name") {
+        settings.matchName = value;
+    } else if (key == "Address" && (section == "Network" || section == "Address")) {
         applyAddress(section, value, settings);
     } else if (section != "Network") {
         return;
@@ -188,7 +176,7 @@ std::optional<std::uint64_t> parseTimeSpan(std::string_view text) {
     std::uint64_t total = 0;
     while (!text.empty()) {
         const std::size_t numberEnd = std::min(text.find_first_not_of(digits), text.size());
-        const auto count = number<std::uint64_t>(text.substr(0, numberEnd));
+        const auto count = parseNumber<std::uint64_t>(text.substr(0, numberEnd));
         text.remove_prefix(numberEnd);
         text.remove_prefix(std::min(text.find_first_not_of(blanks), text.size()));
         const std::size_t unitEnd = std::min(text.find_first_of(" \t0123456789"), text.size());
@@ -246,30 +234,27 @@ NetworkdLease parseNetworkdLease(std::string_view text) {
 }
 
 void applyNetworkFile(std::string_view text, NetworkFile& settings) {
-    std::string_view section;
-    while (!text.empty()) {
-        const std::size_t end = std::min(text.find('\n'), text.size());
-        const std::string_view line = trim(text.substr(0, end));
-        text.remove_prefix(std::min(end + 1, text.size()));
-        if (line.starts_with('#') || line.starts_with(';')) {
-            continue;
-        }
-        if (line.starts_with('[') && line.ends_with(']')) {
-            section = line.substr(1, line.size() - 2);
-        } else if (const std::size_t equals = line.find('='); equals != std::string_view::npos) {
-            applySetting(section, trim(line.substr(0, equals)), trim(line.substr(equals + 1)),
-                         settings);
-        }
-    }
+    forEachKey(text, [&](std::string_view section, std::string_view key, std::string_view value) {
+        applySetting(section, key, value, settings);
+    });
 }
 
 void readNetworkd(const Roots& roots, ClientFacts& facts) {
     NetworkFiles files{roots, facts};
     const std::string links = roots.path(networkdLinksDirectory);
     const std::string leases = roots.path(networkdLeasesDirectory);
+    // Of a service that runs for other links only, these are other links' indexes.
+    const bool elsewhere =
+        !facts.runs(Client::Networkd) && std::any_of(facts.managers.begin(), facts.managers.end(),
+                                                     [](const ManagerProcess& manager) {
+                                                         return manager.client == Client::Networkd;
+                                                     });
+    if (elsewhere) {
+        return;
+    }
     std::vector<std::uint32_t> managed;
     for (const std::string& name : listOptionalDirectory(links, facts.complaints)) {
-        const auto ifindex = number<std::uint32_t>(name);
+        const auto ifindex = parseNumber<std::uint32_t>(name);
         const auto text =
             ifindex ? readOptionalFile(pathIn(links, name), facts.complaints) : std::nullopt;
         if (!text) {
@@ -280,23 +265,25 @@ void readNetworkd(const Roots& roots, ClientFacts& facts) {
             continue;
         }
         managed.push_back(*ifindex);
-        Management management{.client = Client::Networkd,
-                              .ifindex = *ifindex,
-                              .dhcp4 = {},
-                              .dhcp6 = {},
-                              .staticAddresses = {}};
+        LinkConfiguration management{.client = Client::Networkd,
+                                     .ifindex = *ifindex,
+                                     .dhcp4 = {},
+                                     .dhcp6 = {},
+                                     .staticAddresses = {},
+                                     .origin = pathIn(links, name)};
         if (!link.networkFile.empty()) {
             if (const auto& settings = files.settings(link.networkFile)) {
                 management.dhcp4 = settings->dhcp4;
                 management.dhcp6 = settings->dhcp6;
                 management.staticAddresses = settings->addresses;
                 management.linkLocal4 = settings->linkLocal4;
+                management.origin = roots.path(link.networkFile);
             }
         }
         facts.managements.push_back(std::move(management));
     }
     for (const std::string& name : listOptionalDirectory(leases, facts.complaints)) {
-        const auto ifindex = number<std::uint32_t>(name);
+        const auto ifindex = parseNumber<std::uint32_t>(name);
         const auto text =
             ifindex ? readOptionalFile(pathIn(leases, name), facts.complaints) : std::nullopt;
         if (!text) {
@@ -316,7 +303,8 @@ void readNetworkd(const Roots& roots, ClientFacts& facts) {
              .server = std::move(lease.server),
              .clientAlive = std::find(managed.begin(), managed.end(), *ifindex) != managed.end(),
              // The file says how long, not since when; it goes when the lease goes.
-             .expires = endless ? std::optional{Lease::never} : std::nullopt});
+             .expires = endless ? std::optional{Lease::never} : std::nullopt,
+             .origin = pathIn(leases, name)});
     }
 }
 

@@ -60,13 +60,15 @@ struct NetworkFile {
     bool dhcp6 = false;
     bool linkLocal4 = false;
     std::vector<std::string> addresses;  ///< IPv4, canonical text, without prefix length
+    std::string matchName{};             ///< names of links that it is for, patterns among them
 
     bool operator==(const NetworkFile&) const = default;
 };
 /// Applies a file, or a drop-in on top of what went before.
 void applyNetworkFile(std::string_view text, NetworkFile& settings);
 
-/// Adds leases and managements of all links that networkd knows.
+/// Adds leases and managements of all links that networkd knows. Needs the
+/// processes to be in the facts.
 void readNetworkd(const Roots& roots, ClientFacts& facts);
 
 }  // namespace ZR::Live

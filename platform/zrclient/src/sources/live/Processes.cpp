@@ -7,17 +7,21 @@
 #include <algorithm>
 #include <array>
 #include <cerrno>
-#include <charconv>
 #include <cstddef>
 #include <memory>
 #include <optional>
 #include <span>
 #include <string>
 #include <string_view>
+#include <system_error>
 #include <vector>
 
 #include "Dhclient.h"
+#include "Dhcp6c.h"
+#include "Dhcpcd.h"
 #include "Files.h"
+#include "Numbers.h"
+#include "Udhcpc.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace ZR::Live {
@@ -28,8 +32,24 @@ struct KnownClient {
     std::string_view name;  // as /proc/PID/comm has it: at most 15 bytes
     std::optional<ClientProcess> (*parse)(std::span<const std::string_view> arguments);
 };
-constexpr std::array<KnownClient, 1> knownClients{{
+constexpr std::array<KnownClient, 6> knownClients{{
     {"dhclient", parseDhclientArguments},
+    {"dhcpcd", parseDhcpcdArguments},
+    {"udhcpc", parseUdhcpcArguments},
+    {"udhcpc6", parseUdhcpcArguments},
+    {"busybox", parseUdhcpcArguments},
+    {"dhcp6c", parseDhcp6cArguments},
+}};
+
+/// Which process name is which program that manages links.
+struct KnownManager {
+    std::string_view name;  // as /proc/PID/comm has it: at most 15 bytes
+    Client client;
+};
+constexpr std::array<KnownManager, 3> knownManagers{{
+    {"systemd-network", Client::Networkd},  // systemd-networkd, cut off
+    {"NetworkManager", Client::NetworkManager},
+    {"wickedd-dhcp4", Client::Wicked},
 }};
 
 struct CloseDirectory {
@@ -71,8 +91,10 @@ std::string_view readShort(int proc, const char* path, std::span<char> buffer) {
                     : std::string_view{buffer.data(), static_cast<std::size_t>(got)};
 }
 
+/// Empty when it cannot be read, for the reason that errno then has.
 std::string readNamespace(int proc, const char* path) {
     std::array<char, 64> target{};
+    errno = 0;
     const ssize_t length = ::readlinkat(proc, path, target.data(), target.size());
     return length <= 0 ? std::string{}
                        : std::string(target.data(), static_cast<std::size_t>(length));
@@ -88,19 +110,38 @@ std::vector<std::string_view> splitArguments(std::string_view commandLine) {
     return arguments;
 }
 
+/// Where a process runs, seen from this network namespace.
+ManagerProcess::Where whereIs(int proc, std::string_view process, const std::string& ownNamespace) {
+    const std::string other = readNamespace(proc, ProcessPath{process, "/ns/net"}.get());
+    if (other.empty() || ownNamespace.empty()) {
+        return ManagerProcess::Where::Unknown;
+    }
+    return other == ownNamespace ? ManagerProcess::Where::Here : ManagerProcess::Where::Elsewhere;
+}
+
+std::int32_t numberOf(std::string_view process) {
+    return parseNumber<std::int32_t>(process).value_or(0);
+}
+
 void readClient(int proc, std::string_view process, const KnownClient& client,
                 const std::string& ownNamespace, ClientFacts& facts) {
-    if (ownNamespace.empty() ||
-        readNamespace(proc, ProcessPath{process, "/ns/net"}.get()) != ownNamespace) {
-        return;
-    }
     std::array<char, 4096> buffer{};
     // A process that has ended but was not waited for keeps its name and has no
     // arguments; it parses to nothing.
     const auto arguments =
         splitArguments(readShort(proc, ProcessPath{process, "/cmdline"}.get(), buffer));
-    if (auto found = client.parse(arguments)) {
-        std::from_chars(process.data(), process.data() + process.size(), found->pid);
+    auto found = client.parse(arguments);
+    if (!found) {
+        return;
+    }
+    const auto where = whereIs(proc, process, ownNamespace);
+    if (where == ManagerProcess::Where::Unknown && (errno == EACCES || errno == EPERM)) {
+        facts.complaints.push_back("cannot tell the links of process " + std::string{process} +
+                                   " (" + std::string{nameOf(found->client)} +
+                                   "): " + std::generic_category().message(errno));
+    }
+    if (where == ManagerProcess::Where::Here) {
+        found->pid = numberOf(process);
         facts.processes.push_back(*std::move(found));
     }
 }
@@ -134,6 +175,15 @@ void readProcesses(const Roots& roots, ClientFacts& facts) {
                          [&](const KnownClient& known) { return known.name == name; });
         if (client != knownClients.end()) {
             readClient(proc, process, *client, ownNamespace, facts);
+            continue;
+        }
+        const auto* const manager =
+            std::find_if(knownManagers.begin(), knownManagers.end(),
+                         [&](const KnownManager& known) { return known.name == name; });
+        if (manager != knownManagers.end()) {
+            facts.managers.push_back({.client = manager->client,
+                                      .where = whereIs(proc, process, ownNamespace),
+                                      .pid = numberOf(process)});
         }
     }
     if (errno != 0) {

@@ -5,9 +5,10 @@
 
 namespace ZR::Live {
 
-/// Adds the running DHCP clients. Those of another network namespace concern
-/// other links, possibly of the same names; those whose namespace cannot be told
-/// are not trusted. Of any other process nothing but its name is read.
+/// Adds the running DHCP clients, and the programs that manage links. Clients of
+/// another network namespace concern other links, possibly of the same names; those
+/// whose namespace cannot be told are not trusted. Of any other process nothing but
+/// its name is read.
 void readProcesses(const Roots& roots, ClientFacts& facts);
 
 }  // namespace ZR::Live

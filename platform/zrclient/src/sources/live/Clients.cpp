@@ -1,0 +1,67 @@
+#include "Clients.h"
+
+#include <array>
+
+#include "Dhclient.h"
+#include "Dhcpcd.h"
+#include "Ifcfg.h"
+#include "Ifupdown.h"
+#include "Ipconfig.h"
+#include "Netplan.h"
+#include "NetworkManager.h"
+#include "Networkd.h"
+#include "Processes.h"
+#include "Sockets.h"
+#include "Udhcpc.h"
+#include "Wicked.h"
+
+namespace ZR::Live {
+namespace {
+
+constexpr std::array networkdPlaces{ClientPlace{networkdLinksDirectory, ""},
+                                    ClientPlace{networkdLeasesDirectory, ""}};
+constexpr std::array networkManagerPlaces{
+    ClientPlace{networkManagerDevices, ""}, ClientPlace{networkManagerState, "internal-"},
+    ClientPlace{networkManagerProfiles[0], ""}, ClientPlace{networkManagerProfiles[1], ""},
+    ClientPlace{networkManagerProfiles[2], ""}};
+constexpr std::array wickedPlaces{ClientPlace{wickedDirectories[0], wickedLeasePrefix},
+                                  ClientPlace{wickedDirectories[1], wickedLeasePrefix}};
+constexpr std::array dhclientPlaces{ClientPlace{dhclientDirectories[0].path, dhclientNamePrefix},
+                                    ClientPlace{dhclientDirectories[1].path, dhclientNamePrefix},
+                                    ClientPlace{dhclientDirectories[2].path, dhclientNamePrefix}};
+constexpr std::array dhcpcdPlaces{
+    ClientPlace{dhcpcdDirectories[0].path, dhcpcdDirectories[0].namePrefix},
+    ClientPlace{dhcpcdDirectories[1].path, dhcpcdDirectories[1].namePrefix},
+    ClientPlace{dhcpcdDirectories[2].path, dhcpcdDirectories[2].namePrefix}};
+constexpr std::array udhcpcPlaces{ClientPlace{udhcpcStateDirectory, udhcpcStatePrefix}};
+constexpr std::array ipconfigPlaces{ClientPlace{ipconfigDirectory, ipconfigPrefix}};
+constexpr std::array netplanPlaces{ClientPlace{netplanDirectory, ""}};
+constexpr std::array ifupdownPlaces{ClientPlace{ifupdownDirectory, ifupdownFile},
+                                    ClientPlace{ifupdownStateDirectory, ifupdownStateFile}};
+constexpr std::array ifcfgPlaces{ClientPlace{ifcfgDirectories[0], ifcfgPrefix},
+                                 ClientPlace{ifcfgDirectories[1], ifcfgPrefix}};
+
+// Managers before the clients that they may start, and those before what is left of
+// the boot. Processes and sockets have no files that could be watched.
+constexpr std::array sources{
+    ClientSource{readProcesses, {}},
+    ClientSource{readNetworkd, networkdPlaces},
+    ClientSource{readNetworkManager, networkManagerPlaces},
+    ClientSource{readWicked, wickedPlaces},
+    ClientSource{readDhclient, dhclientPlaces},
+    ClientSource{readDhcpcd, dhcpcdPlaces},
+    ClientSource{readUdhcpc, udhcpcPlaces},
+    ClientSource{readIpconfig, ipconfigPlaces},
+    ClientSource{readNetplan, netplanPlaces},
+    ClientSource{readIfupdown, ifupdownPlaces},
+    ClientSource{readIfcfg, ifcfgPlaces},
+    ClientSource{readSockets, {}},
+};
+
+}  // namespace
+
+std::span<const ClientSource> clientSources() noexcept {
+    return sources;
+}
+
+}  // namespace ZR::Live

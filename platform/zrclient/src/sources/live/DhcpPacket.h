@@ -1,0 +1,50 @@
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <optional>
+#include <span>
+#include <string>
+#include <string_view>
+#include <variant>
+#include <vector>
+
+namespace ZR::Live {
+
+/// Facts, or the reason why there are none.
+template <typename Facts>
+using Parsed = std::variant<Facts, std::string_view>;
+
+/// What a server's BOOTP or DHCP reply says (RFC 951, RFC 2131).
+struct DhcpReply {
+    std::string address;                     ///< "your" address, canonical text; empty for none
+    std::string server;                      ///< option 54, canonical text; empty for none
+    bool bootp = false;                      ///< no DHCP message type (option 53)
+    std::optional<std::uint32_t> leaseTime;  ///< option 51, seconds; UINT32_MAX: for ever
+
+    bool operator==(const DhcpReply&) const = default;
+};
+
+/// Parses the message that a server sent, from its first byte to its end option.
+/// Options that are split (RFC 3396) or overflow into the file and server name fields
+/// (option 52) are put together.
+[[nodiscard]] Parsed<DhcpReply> parseDhcpReply(std::span<const std::byte> message);
+
+/// One address of a DHCPv6 reply.
+struct Dhcp6Address {
+    std::string address;              ///< canonical text
+    std::uint32_t validLifetime = 0;  ///< seconds; UINT32_MAX: for ever
+
+    bool operator==(const Dhcp6Address&) const = default;
+};
+
+/// What a server's DHCPv6 reply says (RFC 8415). It names its server by a DUID only,
+/// which is no address.
+struct Dhcp6Reply {
+    std::vector<Dhcp6Address> addresses;
+
+    bool operator==(const Dhcp6Reply&) const = default;
+};
+[[nodiscard]] Parsed<Dhcp6Reply> parseDhcp6Reply(std::span<const std::byte> message);
+
+}  // namespace ZR::Live

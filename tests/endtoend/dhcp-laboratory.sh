@@ -1,0 +1,123 @@
+# Two machines in a laboratory, for tests to source: a DHCP server (dnsmasq) and a
+# client on the two ends of a veth pair, each in a network namespace of its own. The
+# client also has file systems of its own wherever DHCP clients write, so that nothing
+# of the machine that runs the test is touched or read.
+#
+# The test has set `program` to the path of cimdhcp. It gets
+#   $work           a directory that goes with the test
+#   in_client ...   runs a command on the client's machine, in_server ... on the server's
+#   cimdhcp ...     runs the program on the client's machine
+#   start_server    starts the server, with further options of dnsmasq
+#   fail, expect, eventually, value, kernel_address    see below
+# The server is 198.51.100.1 and gives addresses from 198.51.100.100 on; the client's
+# link is eth1.
+
+for tool in ip jq dnsmasq nsenter unshare; do
+    command -v "$tool" >/dev/null || PATH=$PATH:/usr/sbin:/sbin
+    command -v "$tool" >/dev/null || { echo "needs $tool"; exit 1; }
+done
+[[ $EUID == 0 ]] || { echo "needs root: makes network namespaces"; exit 1; }
+
+server=zr-server-$$
+client=zr-client-$$
+work=$(mktemp -d)
+dnsmasq_pid=
+holder=
+at_end=()  # commands to run before the laboratory goes
+
+cleanup() {
+    local command
+    for command in "${at_end[@]}"; do
+        eval "$command" 2>/dev/null || true
+    done
+    [[ -n $dnsmasq_pid ]] && kill "$dnsmasq_pid" 2>/dev/null || true
+    # Whatever the client's machine still runs, by its number: it is all the test's own.
+    local pid
+    for pid in $(ip netns pids "$client" 2>/dev/null); do
+        kill -9 "$pid" 2>/dev/null || true
+    done
+    ip netns delete "$client" 2>/dev/null || true
+    ip netns delete "$server" 2>/dev/null || true
+    rm -rf "$work"
+}
+trap cleanup EXIT
+
+fail() {
+    echo "FAILED: $*"
+    exit 1
+}
+
+# expect TEXT COMMAND...: the command's output has the text.
+expect() {
+    local text=$1 output
+    shift
+    output=$("$@" 2>&1) || fail "$* answers status $?: $output"
+    [[ $output == *"$text"* ]] || fail "$* lacks \"$text\": $output"
+}
+
+# eventually COMMAND...: the command succeeds within ten seconds.
+eventually() {
+    local attempt
+    for ((attempt = 0; attempt < 100; ++attempt)); do
+        "$@" >/dev/null 2>&1 && return 0
+        sleep 0.1
+    done
+    return 1
+}
+
+ip netns add "$server"
+ip netns add "$client"
+ip link add zrs$$ netns "$server" type veth peer name eth1 netns "$client"
+ip -n "$server" address add 198.51.100.1/24 dev zrs$$
+ip -n "$server" link set zrs$$ up
+ip -n "$client" link set lo up
+ip -n "$client" link set eth1 up
+
+# One process holds the client's file systems. /sys is read-only there, as in a
+# container: programs then do not wait for a device manager that is not there.
+mkdir -p "$work/data"
+cp /etc/resolv.conf "$work/resolv.conf" 2>/dev/null || : >"$work/resolv.conf"
+ip netns exec "$client" unshare --mount sh -c '
+    mount --make-rprivate / &&
+    mount -t tmpfs tmpfs /run && mount -t tmpfs tmpfs /var/lib &&
+    mkdir /var/lib/dhcp /var/lib/dhcpcd &&
+    { [ ! -e /etc/resolv.conf ] || mount --bind "$1/resolv.conf" /etc/resolv.conf; } &&
+    mount -o remount,bind,ro /sys && : >"$1/ready" && exec sleep infinity' sh "$work" \
+    >"$work/holder.log" 2>&1 &
+holder=$!
+disown  # its end is no news
+eventually test -e "$work/ready" || fail "no file systems: $(<"$work/holder.log")"
+
+in_client() {
+    nsenter --target="$holder" --net --mount -- "$@"
+}
+in_server() {
+    ip netns exec "$server" "$@"
+}
+cimdhcp() {
+    in_client env ZR_LOG_SINK=stderr ZR_DATA_DIR="$work/data" "$program" "$@"
+}
+
+start_server() {
+    in_server dnsmasq --keep-in-foreground --conf-file=/dev/null --port=0 \
+        --interface=zrs$$ --bind-interfaces --dhcp-authoritative --no-ping --user=root \
+        --dhcp-range=198.51.100.100,198.51.100.150,255.255.255.0,10m \
+        --dhcp-leasefile="$work/server.leases" --pid-file="$work/dnsmasq.pid" \
+        "$@" >"$work/dnsmasq.log" 2>&1 &
+    dnsmasq_pid=$!
+}
+
+# value PROPERTY [INTERFACE]: what the program sees, as compact JSON; nothing when the
+# interface or the property is not there.
+value() {
+    cimdhcp tree | jq -c --arg name "${2:-eth1}" --arg property "$1" \
+        '[.. | objects | select(.type? == "NetworkInterface" and .properties.Name == $name)
+          | .properties | select(has($property)) | .[$property]]
+         | if length == 0 then empty else .[0] end'
+}
+
+# kernel_address [INTERFACE]: the IPv4 address that the kernel has, without its length.
+kernel_address() {
+    ip -n "$client" -j -4 address show dev "${1:-eth1}" |
+        jq -r '[.[].addr_info[]? | select(.scope == "global") | .local] | .[0] // empty'
+}

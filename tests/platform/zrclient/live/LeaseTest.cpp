@@ -1,0 +1,40 @@
+#include "Lease.h"
+
+#include <gtest/gtest.h>
+
+#include <set>
+
+#include "Support.h"
+
+namespace ZR::Live {
+namespace {
+
+TEST(ClientNames, AreAllDifferent) {
+    std::set<std::string_view> names;
+    for (const Client client :
+         {Client::Networkd, Client::NetworkManager, Client::Wicked, Client::Dhclient,
+          Client::Dhcpcd, Client::Udhcpc, Client::Dhcp6c, Client::Ipconfig, Client::Netplan,
+          Client::Ifupdown, Client::Ifcfg}) {
+        EXPECT_TRUE(names.insert(nameOf(client)).second) << nameOf(client);
+        EXPECT_NE(nameOf(client), "unknown");
+    }
+}
+
+TEST(ClientFacts, AManagerOfAnotherNamespaceDoesNotRunHere) {
+    using Where = ManagerProcess::Where;
+    EXPECT_TRUE(running(Client::Wicked).runs(Client::Wicked));
+    EXPECT_TRUE(running(Client::Wicked, Where::Unknown).runs(Client::Wicked));
+    EXPECT_FALSE(running(Client::Wicked, Where::Elsewhere).runs(Client::Wicked));
+    EXPECT_FALSE(running(Client::Wicked).runs(Client::Networkd));
+    EXPECT_FALSE(ClientFacts{}.runs(Client::Wicked));
+}
+
+TEST(WatchedPlaces, AShorterPrefixCoversALongerOne) {
+    const WatchedPlace place{.directory = "/d", .namePrefix = "a"};
+    EXPECT_TRUE(place.covers({.directory = "/d", .namePrefix = "ab"}));
+    EXPECT_FALSE(place.covers({.directory = "/d", .namePrefix = ""}));
+    EXPECT_FALSE(place.covers({.directory = "/e", .namePrefix = "a"}));
+}
+
+}  // namespace
+}  // namespace ZR::Live
