@@ -17,7 +17,7 @@ constexpr unsigned serviceUnavailable = 503;
 Connections::Connection* Connections::opened(int socket, std::string address) {
     const std::lock_guard lock(mutex_);
     return &connections_.emplace_back(
-        Connection{socket, std::move(address), Clock::now() + request_, nullptr});
+        Connection{socket, std::move(address), Clock::now() + request_, nullptr, false});
 }
 
 void Connections::closed(Connection* connection) {
@@ -31,22 +31,23 @@ void Connections::closed(Connection* connection) {
 }
 
 void Connections::set(Connection& connection, std::chrono::seconds time,
-                      std::shared_ptr<Exchange> exchange) {
+                      std::shared_ptr<Exchange> exchange, bool answering) {
     const std::lock_guard lock(mutex_);
     connection.deadline = Clock::now() + time;
+    connection.answering = answering;
     connection.exchange.swap(exchange);
 }
 
 void Connections::expectRequest(Connection& connection) {
-    set(connection, request_, nullptr);
+    set(connection, request_, nullptr, false);
 }
 
 void Connections::expectResult(Connection& connection, std::shared_ptr<Exchange> exchange) {
-    set(connection, request_, std::move(exchange));
+    set(connection, request_, std::move(exchange), false);
 }
 
 void Connections::expectTaking(Connection& connection) {
-    set(connection, answer_, nullptr);
+    set(connection, answer_, nullptr, true);
 }
 
 void Connections::endOverdue() {
@@ -87,9 +88,11 @@ void Connections::endAll() {
     }
 }
 
-std::size_t Connections::count() const {
+bool Connections::isBusy() const {
     const std::lock_guard lock(mutex_);
-    return connections_.size();
+    return std::any_of(connections_.begin(), connections_.end(), [](const Connection& each) {
+        return each.answering || each.exchange != nullptr;
+    });
 }
 
 }  // namespace cimom::wbem

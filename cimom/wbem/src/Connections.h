@@ -1,7 +1,6 @@
 #pragma once
 
 #include <chrono>
-#include <cstddef>
 #include <list>
 #include <memory>
 #include <mutex>
@@ -23,6 +22,7 @@ class Connections {
         std::string address;
         Clock::time_point deadline;
         std::shared_ptr<Exchange> exchange;  ///< while a worker has it
+        bool answering = false;              ///< the client takes an answer
     };
 
     Connections(std::chrono::seconds request, std::chrono::seconds answer)
@@ -44,10 +44,12 @@ class Connections {
     void endOverdue();
     /// Answers all requests that workers have, since the server ends.
     void endAll();
-    [[nodiscard]] std::size_t count() const;
+    /// Whether an answer is still to be given or taken.
+    [[nodiscard]] bool isBusy() const;
 
   private:
-    void set(Connection& connection, std::chrono::seconds time, std::shared_ptr<Exchange> exchange);
+    void set(Connection& connection, std::chrono::seconds time, std::shared_ptr<Exchange> exchange,
+             bool answering);
 
     const std::chrono::seconds request_;
     const std::chrono::seconds answer_;

@@ -66,10 +66,10 @@ void addNulls(Instance& instance, const ClassRepository& repository,
         return;
     }
     for (const PropertyDeclaration& property : declaration->properties) {
-        const bool listed =
-            !propertyList ||
-            std::any_of(propertyList->begin(), propertyList->end(),
-                        [&](const std::string& name) { return sameName(name, property.name); });
+        const bool listed = !propertyList || std::any_of(propertyList->begin(), propertyList->end(),
+                                                         [&](const std::string& name) {
+                                                             return sameName(name, property.name);
+                                                         });
         if (listed && instance.property(property.name) == nullptr) {
             instance.properties.push_back(
                 {property.name, Value::null(property.type, property.isArray)});

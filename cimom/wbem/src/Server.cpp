@@ -11,6 +11,7 @@
 #include <cstdarg>
 #include <cstdio>
 #include <cstring>
+#include <thread>
 #include <utility>
 
 #include "Connections.h"
@@ -33,6 +34,8 @@ constexpr unsigned serviceUnavailable = 503;
 constexpr std::uint16_t httpPort = 5988;
 constexpr std::uint16_t httpsPort = 5989;
 constexpr std::chrono::milliseconds watchInterval{100};
+/// How long clients have to take their last answers when the server ends.
+constexpr std::chrono::seconds farewell{2};
 constexpr const char* tlsPriorities = "NORMAL:-VERS-ALL:+VERS-TLS1.3:+VERS-TLS1.2";
 
 /// A listening socket, until libmicrohttpd has taken it.
@@ -150,6 +153,10 @@ class Server::Implementation {
         gate_.stop();
         workers_.stop();
         connections_.endAll();
+        const auto patience = Connections::Clock::now() + farewell;
+        while (connections_.isBusy() && Connections::Clock::now() < patience) {
+            std::this_thread::sleep_for(watchInterval / 10);
+        }
         // Ends what still comes in on open connections, too: see handle().
         daemon_.reset();
         ::close(socket_);
