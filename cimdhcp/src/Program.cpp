@@ -19,7 +19,9 @@
 #include "cimdhcp/Overview.h"
 #include "cimdhcp/PlatformSetup.h"
 #include "cimdhcp/Rename.h"
+#include "cimdhcp/Serve.h"
 #include "cimdhcp/TableFormat.h"
+#include "cimdhcp/UserAdd.h"
 #include "zrclient/InstrumentationService.h"
 #include "zrclient/SnapshotJson.h"
 #include "zrcommon/PlatformUtilities.h"
@@ -66,6 +68,15 @@ class Execution {
         outputs_.out << (json() ? classJson(classes) : classTable(classes, outputs_.width));
     }
 
+    void operator()(const ServeCommand& command) const {
+        Client client = openClient();
+        serve(command, client, outputs_.out);
+    }
+
+    void operator()(const UserAddCommand& command) const {
+        addUser(command, outputs_.out, outputs_.err);
+    }
+
     template <typename CimCommand>
     void operator()(const CimCommand& command) const {
         Client client = openClient();
@@ -108,7 +119,10 @@ void runCommand(const std::vector<std::string>& arguments, const Outputs& output
         outputs.out << information->text;
     } else {
         const auto& line = std::get<CommandLine>(parsed);
-        setUpPlatform(line.options, outputs.err);
+        // Who may use the server has nothing to do with the machine.
+        if (!std::holds_alternative<UserAddCommand>(line.command)) {
+            setUpPlatform(line.options, outputs.err);
+        }
         std::visit(Execution(line.options, outputs), line.command);
     }
 }
