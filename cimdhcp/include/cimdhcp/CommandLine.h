@@ -98,10 +98,13 @@ struct UserAddCommand {
 
     bool operator==(const UserAddCommand&) const = default;
 };
+struct CheckCommand {
+    bool operator==(const CheckCommand&) const = default;
+};
 
 using Command = std::variant<ShowCommand, RenameCommand, TreeCommand, ClassesCommand, NamesCommand,
                              InstancesCommand, GetCommand, ModifyCommand, AssociatorsCommand,
-                             ReferencesCommand, ServeCommand, UserAddCommand>;
+                             ReferencesCommand, ServeCommand, UserAddCommand, CheckCommand>;
 
 struct CommandLine {
     Options options;
