@@ -29,9 +29,8 @@ std::string randomContext() {
 
 }  // namespace
 
-std::size_t EnumerationSession::size() const noexcept {
-    const auto* const paths = std::get_if<Paths>(&objects);
-    return paths != nullptr ? paths->size() : std::get_if<Instances>(&objects)->size();
+std::size_t EnumerationSession::size() const {
+    return std::visit([](const auto& rest) { return rest.size(); }, objects);
 }
 
 EnumerationSessions::EnumerationSessions(SessionLimits limits,
