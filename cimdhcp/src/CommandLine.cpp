@@ -3,6 +3,7 @@
 #include <CLI/CLI.hpp>
 #include <map>
 #include <memory>
+#include <stdexcept>
 
 #include "cimdhcp/DisplayText.h"
 #include "cimdhcp/Failure.h"
@@ -217,6 +218,7 @@ class Reader {
     void addServerCommands() {
         CLI::App* const serve =
             command("serve", serverGroup, "Answer WBEM clients: CIM-XML over HTTP", serve_);
+        command("check", serverGroup, "Tell why something is empty or does not work", check_);
         addServeOptions(serve);
         addLimits(serve);
         CLI::App* const user = app_.add_subcommand("user", "The users of the server");
@@ -309,6 +311,13 @@ class Reader {
                           "a graph has no JSON output; it is in Graphviz' language, or with --svg "
                           "drawn");
         }
+        if (const auto* const serve = std::get_if<ServeCommand>(&line_.command)) {
+            try {
+                serve->limits.check();
+            } catch (const std::invalid_argument& error) {
+                throw Failure(ExitStatus::usage, std::string("--") + error.what());
+            }
+        }
         if (options.format == Format::mof && !hasMofForm()) {
             throw Failure(ExitStatus::usage,
                           "this command has no MOF output; use --format table or json");
@@ -322,7 +331,8 @@ class Reader {
                !std::holds_alternative<TreeCommand>(line_.command) &&
                !std::holds_alternative<ClassesCommand>(line_.command) &&
                !std::holds_alternative<ServeCommand>(line_.command) &&
-               !std::holds_alternative<UserAddCommand>(line_.command);
+               !std::holds_alternative<UserAddCommand>(line_.command) &&
+               !std::holds_alternative<CheckCommand>(line_.command);
     }
 
     CommandLine line_;
@@ -339,6 +349,7 @@ class Reader {
     ReferencesCommand references_;
     ServeCommand serve_;
     UserAddCommand userAdd_;
+    CheckCommand check_;
     CLI::App app_;
 };
 

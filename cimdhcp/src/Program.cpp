@@ -5,6 +5,7 @@
 #include <type_traits>
 #include <variant>
 
+#include "cimdhcp/Check.h"
 #include "cimdhcp/CimCommands.h"
 #include "cimdhcp/ClassList.h"
 #include "cimdhcp/Client.h"
@@ -73,6 +74,14 @@ class Execution {
         serve(command, client, outputs_.out);
     }
 
+    void operator()(const CheckCommand& /*command*/) const {
+        const auto findings = check(options_, installations(executableFile()));
+        outputs_.out << (json() ? checkJson(findings) : checkText(findings));
+        if (!isGood(findings)) {
+            throw Failure(ExitStatus::notDone, "something is wrong, as the list tells");
+        }
+    }
+
     void operator()(const UserAddCommand& command) const {
         addUser(command, outputs_.out, outputs_.err);
     }
@@ -119,8 +128,10 @@ void runCommand(const std::vector<std::string>& arguments, const Outputs& output
         outputs.out << information->text;
     } else {
         const auto& line = std::get<CommandLine>(parsed);
-        // Who may use the server has nothing to do with the machine.
-        if (!std::holds_alternative<UserAddCommand>(line.command)) {
+        // Who may use the server has nothing to do with the machine; the check does
+        // this itself, and goes on when it fails.
+        if (!std::holds_alternative<UserAddCommand>(line.command) &&
+            !std::holds_alternative<CheckCommand>(line.command)) {
             setUpPlatform(line.options, outputs.err);
         }
         std::visit(Execution(line.options, outputs), line.command);

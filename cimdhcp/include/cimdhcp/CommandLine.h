@@ -103,10 +103,14 @@ struct UserAddCommand {
 
     bool operator==(const UserAddCommand&) const = default;
 };
+struct CheckCommand {
+    bool operator==(const CheckCommand&) const = default;
+};
 
-using Command = std::variant<ShowCommand, RenameCommand, GraphCommand, TreeCommand, ClassesCommand,
-                             NamesCommand, InstancesCommand, GetCommand, ModifyCommand,
-                             AssociatorsCommand, ReferencesCommand, ServeCommand, UserAddCommand>;
+using Command =
+    std::variant<ShowCommand, RenameCommand, GraphCommand, TreeCommand, ClassesCommand,
+                 NamesCommand, InstancesCommand, GetCommand, ModifyCommand, AssociatorsCommand,
+                 ReferencesCommand, ServeCommand, UserAddCommand, CheckCommand>;
 
 struct CommandLine {
     Options options;

@@ -29,12 +29,8 @@ std::string randomContext() {
 
 }  // namespace
 
-std::size_t EnumerationSession::size() const noexcept {
-    if (const auto* const paths = std::get_if<Paths>(&objects)) {
-        return paths->size();
-    }
-    const auto* const instances = std::get_if<Instances>(&objects);
-    return instances == nullptr ? 0 : instances->size();
+std::size_t EnumerationSession::size() const {
+    return std::visit([](const auto& rest) { return rest.size(); }, objects);
 }
 
 EnumerationSessions::EnumerationSessions(SessionLimits limits,

@@ -3,6 +3,7 @@
 #include <cmpift.h>
 
 #include <condition_variable>
+#include <cstdlib>
 #include <mutex>
 #include <string>
 #include <string_view>
@@ -81,6 +82,9 @@ CMPIStatus enumerateInstances(CMPIInstanceMI*, const CMPIContext*, const CMPIRes
     {
         const std::lock_guard lock(mutex);
         count = things;
+    }
+    if (const char* const wanted = std::getenv("MANY_THINGS")) {
+        count = static_cast<unsigned>(std::strtoul(wanted, nullptr, 10));
     }
     for (unsigned number = 0; number < count; ++number) {
         give(result, number);

@@ -142,12 +142,6 @@ bool RawClient::send(const std::string& bytes) {
     return true;
 }
 
-void RawClient::finishSending() const {
-    if (::shutdown(fd_, SHUT_WR) != 0 && errno != ENOTCONN) {
-        throw std::system_error(errno, std::generic_category(), "shutdown");
-    }
-}
-
 bool RawClient::fill() {
     std::array<char, 65536> piece{};
     const ssize_t got = ::recv(fd_, piece.data(), piece.size(), 0);

@@ -59,8 +59,6 @@ class RawClient {
 
     /// False when the server has closed the connection.
     bool send(const std::string& bytes);
-    /// Nothing more comes from this side.
-    void finishSending() const;
     /// The next answer; none when the connection ends before it is whole.
     std::optional<HttpResponse> receive();
     /// Waits for the server to close the connection; false after ten seconds.

@@ -26,7 +26,7 @@ struct EnumerationSession {
     std::chrono::seconds timeout{0};  ///< of silence, after which it is forgotten
     std::optional<std::string> user;  ///< who opened it; nobody else may go on
 
-    [[nodiscard]] std::size_t size() const noexcept;
+    [[nodiscard]] std::size_t size() const;
 };
 
 struct SessionLimits {
