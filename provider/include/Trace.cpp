@@ -63,7 +63,7 @@ struct Argument {
     std::string_view text;
 };
 
-/// Copies `size` bytes as a run of blocks and a last block that overlaps the run.
+/// Copies at least `block` bytes as a run of blocks and a last block that overlaps the run.
 template <std::size_t block>
 inline void copyBlocks(char* out, const char* in, std::size_t size) {
     for (std::size_t done = 0; done + block < size; done += block) {
@@ -77,6 +77,8 @@ inline void copyBlocks(char* out, const char* in, std::size_t size) {
 inline void copyShort(char* out, const char* in, std::size_t size) {
     if (size >= 16) {
         copyBlocks<16>(out, in, size);
+    } else if (size >= 8) {
+        copyBlocks<8>(out, in, size);
     } else if (size >= 4) {
         copyBlocks<4>(out, in, size);
     } else {
@@ -105,18 +107,20 @@ struct Buffer {
 /// Formats into the buffer, up to its last byte, which stays zero.
 template <std::size_t count>
 std::string_view format(Buffer& buffer, const Format& format, const Argument (&arguments)[count]) {
-    std::size_t size = 0;
-    const auto put = [&size, &buffer](std::string_view piece) {
-        const std::size_t fits = std::min(piece.size(), buffer.text.size() - 1 - size);
-        copyShort(buffer.text.data() + size, piece.data(), fits);
-        size += fits;
+    char* const begin = buffer.text.data();
+    char* const last = begin + buffer.text.size() - 1;
+    char* end = begin;
+    const auto put = [&end, last](std::string_view piece) {
+        const std::size_t fits = std::min(piece.size(), static_cast<std::size_t>(last - end));
+        copyShort(end, piece.data(), fits);
+        end += fits;
     };
     for (std::size_t i = 0; i < count; ++i) {
         put(format.literals[i]);
         put(arguments[i].text);
     }
     put(format.literals[count]);
-    return buffer.keep(size);
+    return buffer.keep(static_cast<std::size_t>(end - begin));
 }
 
 std::string_view formatNothing(Buffer& buffer) {
