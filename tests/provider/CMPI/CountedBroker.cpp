@@ -2,8 +2,7 @@
 
 #include <deque>
 #include <numeric>
-
-#include "include/Exceptions.h"
+#include <stdexcept>
 
 namespace test {
 
@@ -129,7 +128,7 @@ bool failsNow(Function function) {
     }
     state.deliveredBeforeFault = delivered;
     if (state.fault == Fault::exception) {
-        throw ZR::ProviderException("a function of the broker threw");
+        throw std::runtime_error("a function of the broker threw");
     }
     return true;
 }
