@@ -19,13 +19,8 @@ constexpr const char* ipAssignmentSettingData = "QVXZR_IPAssignmentSettingData";
 constexpr unsigned short notDedicated = 0;
 constexpr unsigned short managementController = 28;
 constexpr unsigned short protocolIPv4 = 4096;
-constexpr unsigned short originDHCP = 4;
-
-/// AddressOrigin by address source: unknown, DHCP, BOOTP, static, IPv4 link local, other.
-unsigned short addressOrigin(unsigned int addressSource) {
-    constexpr std::array<unsigned short, 6> origins{0, originDHCP, 5, 3, 6, 1};
-    return addressSource < origins.size() ? origins[addressSource] : origins[0];
-}
+constexpr unsigned short originDHCP =
+    NodeLexicon::addressOriginOf(static_cast<unsigned int>(NodeLexicon::AddressSource::DHCP));
 
 NeighbourObject computerObject(const ComputerFacts& computer) {
     const char* className = computer.isServiceProcessor ? serviceProcessorSystem : computerSystem;
@@ -50,7 +45,7 @@ NeighbourObject endpointObject(const InterfaceFacts& interface) {
              {"NameFormat", std::string("NICName")},
              {"ProtocolIFType", protocolIPv4},
              {"IPv4Address", interface.ipv4Address},
-             {"AddressOrigin", addressOrigin(interface.addressSource)}}};
+             {"AddressOrigin", NodeLexicon::addressOriginOf(interface.addressSource)}}};
 }
 
 NeighbourObject assignmentObject(const InterfaceFacts& interface) {

@@ -160,6 +160,9 @@ class Reader {
         rename->add_option("NAME", rename_.name, "The new configuration name")->required();
         rename->add_flag("--create", rename_.create,
                          "Make the interface's configuration file if there is none");
+        CLI::App* const graph =
+            command("graph", machineGroup, "Instances and associations, for Graphviz", graph_);
+        graph->add_flag("--svg", graph_.svg, "Draw it as SVG (needs the package graphviz)");
         command("tree", machineGroup, "What is known of the machine, as a JSON tree", tree_);
     }
 
@@ -230,6 +233,11 @@ class Reader {
                 throw Failure(ExitStatus::usage, std::string(name) + " needs a name");
             }
         }
+        if (options.format == Format::json && std::holds_alternative<GraphCommand>(line_.command)) {
+            throw Failure(ExitStatus::usage,
+                          "a graph has no JSON output; it is in Graphviz' language, or with --svg "
+                          "drawn");
+        }
         if (options.format == Format::mof && !hasMofForm()) {
             throw Failure(ExitStatus::usage,
                           "this command has no MOF output; use --format table or json");
@@ -239,6 +247,7 @@ class Reader {
     [[nodiscard]] bool hasMofForm() const {
         return !std::holds_alternative<ShowCommand>(line_.command) &&
                !std::holds_alternative<RenameCommand>(line_.command) &&
+               !std::holds_alternative<GraphCommand>(line_.command) &&
                !std::holds_alternative<TreeCommand>(line_.command) &&
                !std::holds_alternative<ClassesCommand>(line_.command);
     }
@@ -246,6 +255,7 @@ class Reader {
     CommandLine line_;
     ShowCommand show_;
     RenameCommand rename_;
+    GraphCommand graph_;
     TreeCommand tree_;
     ClassesCommand classes_;
     NamesCommand names_;

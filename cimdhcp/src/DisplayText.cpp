@@ -1,5 +1,6 @@
 #include "cimdhcp/DisplayText.h"
 
+#include <bit>
 #include <clocale>
 #include <cstdint>
 #include <cwchar>
@@ -45,7 +46,7 @@ int widthOf(wchar_t unit) {
 std::string escaped(wchar_t unit) {
     constexpr std::uint32_t firstStrayByte = 0xDC80;  // as ZR::make_wstring marks them
     constexpr std::uint32_t lastStrayByte = 0xDCFF;
-    auto value = static_cast<std::uint32_t>(unit);
+    auto value = std::bit_cast<std::uint32_t>(unit);
     std::string text = "\\";
     unsigned digits = 2;
     if (value >= firstStrayByte && value <= lastStrayByte) {

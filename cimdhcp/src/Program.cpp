@@ -11,6 +11,8 @@
 #include "cimdhcp/CommandLine.h"
 #include "cimdhcp/Directories.h"
 #include "cimdhcp/Failure.h"
+#include "cimdhcp/Graph.h"
+#include "cimdhcp/GraphDrawing.h"
 #include "cimdhcp/JsonFormat.h"
 #include "cimdhcp/MachineOverview.h"
 #include "cimdhcp/MofFormat.h"
@@ -48,6 +50,12 @@ class Execution {
         outputs_.out << (json() ? renameJson(report) : renameText(report));
     }
 
+    void operator()(const GraphCommand& command) const {
+        Client client = openClient();
+        const std::string text = graphvizText(graphOfMachine(client));
+        outputs_.out << (command.svg ? drawSvg(text) : text);
+    }
+
     void operator()(const TreeCommand& /*command*/) const {
         outputs_.out << ZR::toJson(*ZR::InstrumentationService::process().current());
     }
@@ -75,8 +83,7 @@ class Execution {
     [[nodiscard]] bool json() const { return options_.format == Format::json; }
 
     [[nodiscard]] Client openClient() const {
-        return Client(findDirectories(options_, installations(executableFile())),
-                      options_.nameSpace);
+        return {findDirectories(options_, installations(executableFile())), options_.nameSpace};
     }
 
     [[nodiscard]] std::string formatted(const Answer& answer, const Client& client) const {

@@ -61,7 +61,7 @@ std::string realText(double number) {
     }
     // 24 characters hold the shortest text of any double.
     std::array<char, 32> buffer{};
-    const auto end = std::to_chars(buffer.data(), buffer.data() + buffer.size(), number).ptr;
+    auto* const end = std::to_chars(buffer.data(), buffer.data() + buffer.size(), number).ptr;
     std::string text(buffer.data(), end);
     if (text.find('.') == std::string::npos) {
         // A real literal needs a point before its exponent.

@@ -13,6 +13,9 @@ constexpr std::size_t cloneChunk = 512;
 
 }  // namespace
 
+// Chunks have no type, and no object of theirs is ever destroyed.
+// NOLINTBEGIN(cppcoreguidelines-no-malloc)
+
 Arena::~Arena() {
     while (chunks_ != nullptr) {
         Chunk* const previous = chunks_->previous;
@@ -55,5 +58,7 @@ void* Arena::grow(std::size_t bytes) {
     end_ = static_cast<std::byte*>(memory) + size;
     return first;
 }
+
+// NOLINTEND(cppcoreguidelines-no-malloc)
 
 }  // namespace cimom::broker

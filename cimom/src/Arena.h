@@ -47,10 +47,12 @@ class Arena {
     T* makeMany(std::size_t count) {
         static_assert(std::is_trivially_destructible_v<T>);
         static_assert(alignof(T) <= alignment);
-        if (count > static_cast<std::size_t>(-1) / 2 / sizeof(T)) {
+        constexpr std::size_t size =
+            sizeof(T);  // NOLINT(bugprone-sizeof-expression): of pointers, too
+        if (count > static_cast<std::size_t>(-1) / 2 / size) {
             throw std::bad_alloc();
         }
-        T* const first = static_cast<T*>(allocate(count * sizeof(T)));
+        T* const first = static_cast<T*>(allocate(count * size));
         std::uninitialized_value_construct_n(first, count);
         return first;
     }
@@ -85,7 +87,7 @@ class Arena {
     std::byte* next_ = nullptr;
     std::byte* end_ = nullptr;
     Chunk* chunks_ = nullptr;
-    std::size_t nextChunk_ = 16 * 1024;
+    std::size_t nextChunk_ = std::size_t{16} * 1024;
     std::size_t reserved_ = 0;
     const void* root_ = nullptr;
     bool locked_ = false;

@@ -8,6 +8,7 @@
 namespace cimom::broker {
 
 /// A CMPIArgs: named method arguments.
+// NOLINTNEXTLINE(cppcoreguidelines-pro-type-member-init): the arena value-initialises it
 struct ArgsRecord : CMPIArgs {
     Arena* arena;
     EntryList entries;

@@ -93,7 +93,7 @@ ArrayRecord* arrayOf(const CMPIArray* array) noexcept {
 }
 
 ArrayRecord* makeArray(Arena& arena, CMPICount size, CMPIType elementType) {
-    CMPIData* const elements = arena.makeMany<CMPIData>(size);
+    auto* const elements = arena.makeMany<CMPIData>(size);
     for (CMPIData* element = elements; element != elements + size; ++element) {
         *element = nullData(elementType);
     }

@@ -10,6 +10,7 @@
 namespace cimom::broker {
 
 /// A CMPIContext: what a provider may know of a request beside its parameters.
+// NOLINTNEXTLINE(cppcoreguidelines-pro-type-member-init): the arena value-initialises it
 struct ContextRecord : CMPIContext {
     Arena* arena;
     EntryList entries;

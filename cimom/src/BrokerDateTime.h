@@ -12,6 +12,7 @@ namespace cimom::broker {
 
 /// A CMPIDateTime. The text is kept as given, with its offset from UTC and its
 /// unknown digits. Never changes.
+// NOLINTNEXTLINE(cppcoreguidelines-pro-type-member-init): the arena value-initialises it
 struct DateTimeRecord : CMPIDateTime {
     Arena* arena;
     DateTime value;

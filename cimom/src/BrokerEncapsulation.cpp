@@ -182,18 +182,20 @@ CMPIString* message(const CMPIBroker* mb, const char* text, CMPIStatus* rc, CMPI
                     std::va_list arguments) {
     std::va_list copy;
     va_copy(copy, arguments);
-    CMPIString* const result =
-        made<CMPIString>(mb, rc, [&](const Broker&, CMPIrc& code) -> CMPIString* {
-            std::string formatted;
-            if (!formatMessage(orEmpty(text), count, copy, formatted)) {
-                code = count > 10 ? CMPI_RC_ERR_INVALID_PARAMETER : CMPI_RC_ERR_TYPE_MISMATCH;
-                return nullptr;
-            }
-            return makeString(arena(), formatted);
-        });
+    auto* const result = made<CMPIString>(mb, rc, [&](const Broker&, CMPIrc& code) -> CMPIString* {
+        std::string formatted;
+        if (!formatMessage(orEmpty(text), count, copy, formatted)) {
+            code = count > 10 ? CMPI_RC_ERR_INVALID_PARAMETER : CMPI_RC_ERR_TYPE_MISMATCH;
+            return nullptr;
+        }
+        return makeString(arena(), formatted);
+    });
     va_end(copy);
     return result;
 }
+
+// The slots of the function table have a variable number of arguments.
+// NOLINTBEGIN(cert-dcl50-cpp)
 
 /// No translations exist, so that the default text always counts.
 CMPIString* getMessage(const CMPIBroker* mb, const char*, const char* text, CMPIStatus* rc,
@@ -213,6 +215,8 @@ CMPIString* getMessage2(const CMPIBroker* mb, const char*, CMPIMsgFileHandle, co
     va_end(arguments);
     return result;
 }
+
+// NOLINTEND(cert-dcl50-cpp)
 
 /// Providers log by means of their own.
 CMPIStatus logMessage(const CMPIBroker*, int, const char*, const char*, const CMPIString*) {

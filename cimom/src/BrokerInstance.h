@@ -19,6 +19,7 @@ struct PropertyFilter {
 };
 
 /// A CMPIInstance.
+// NOLINTNEXTLINE(cppcoreguidelines-pro-type-member-init): the arena value-initialises it
 struct InstanceRecord : CMPIInstance {
     Arena* arena;
     PathRecord* path;

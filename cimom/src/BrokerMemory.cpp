@@ -9,6 +9,9 @@
 
 namespace cimom::broker {
 
+// Providers allocate here as they would with malloc(), and may resize what they have.
+// NOLINTBEGIN(cppcoreguidelines-no-malloc)
+
 MemoryPool::~MemoryPool() {
     for (void* const block : blocks_) {
         std::free(block);
@@ -66,6 +69,8 @@ void MemoryPool::free(void* block) {
     }
 }
 
+// NOLINTEND(cppcoreguidelines-no-malloc)
+
 std::size_t MemoryPool::blocks() const {
     const std::lock_guard lock(mutex_);
     return blocks_.size();
@@ -79,6 +84,8 @@ CMPIGcStat* mark(const CMPIBroker* mb, CMPIStatus* rc) {
             code = CMPI_RC_ERR_INVALID_HANDLE;
             return nullptr;
         }
+        // The mark is opaque to the provider, which only gives it back.
+        // NOLINTNEXTLINE(cppcoreguidelines-pro-type-const-cast)
         return const_cast<void*>(RequestScope::current().mark());
     });
 }

@@ -10,6 +10,7 @@
 namespace cimom::broker {
 
 /// A CMPIObjectPath. Components that are not set are empty texts.
+// NOLINTNEXTLINE(cppcoreguidelines-pro-type-member-init): the arena value-initialises it
 struct PathRecord : CMPIObjectPath {
     Arena* arena;
     const Schema* schema;  ///< null: no class is known

@@ -34,6 +34,7 @@ namespace cimom::broker {
 template <typename Member>
 [[nodiscard]] Member memberOf(const CMPIValue* value) noexcept {
     Member member;
+    // NOLINTNEXTLINE(bugprone-sizeof-expression): of pointers, too
     std::memcpy(&member, static_cast<const void*>(value), sizeof member);
     return member;
 }

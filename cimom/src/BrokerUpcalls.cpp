@@ -136,9 +136,10 @@ CMPIEnumeration* enumerationFrom(const CMPIBroker* mb, const CMPIStatus& status,
 CMPIEnumeration* enumerateInstanceNames(const CMPIBroker* mb, const CMPIContext* context,
                                         const CMPIObjectPath* op, CMPIStatus* rc) {
     PathsResult result;
-    const CMPIStatus status = ask(mb, op, result, [&](ObjectManager& manager, ObjectPath path) {
-        return manager.enumerateInstanceNames(path, {std::nullopt, principalOf(context)});
-    });
+    const CMPIStatus status =
+        ask(mb, op, result, [&](ObjectManager& manager, const ObjectPath& path) {
+            return manager.enumerateInstanceNames(path, {std::nullopt, principalOf(context)});
+        });
     return enumerationFrom(mb, status, rc, result.paths);
 }
 
@@ -146,9 +147,10 @@ CMPIEnumeration* enumerateInstances(const CMPIBroker* mb, const CMPIContext* con
                                     const CMPIObjectPath* op, const char** properties,
                                     CMPIStatus* rc) {
     InstancesResult result;
-    const CMPIStatus status = ask(mb, op, result, [&](ObjectManager& manager, ObjectPath path) {
-        return manager.enumerateInstances(path, {listOf(properties), principalOf(context)});
-    });
+    const CMPIStatus status =
+        ask(mb, op, result, [&](ObjectManager& manager, const ObjectPath& path) {
+            return manager.enumerateInstances(path, {listOf(properties), principalOf(context)});
+        });
     return enumerationFrom(mb, status, rc, result.instances);
 }
 
@@ -156,7 +158,7 @@ CMPIEnumeration* enumerateInstances(const CMPIBroker* mb, const CMPIContext* con
 CMPIStatus askInstance(const CMPIBroker* mb, const CMPIContext* context, const CMPIObjectPath* op,
                        std::optional<std::vector<std::string>> properties,
                        InstancesResult& result) {
-    CMPIStatus status = ask(mb, op, result, [&](ObjectManager& manager, ObjectPath path) {
+    CMPIStatus status = ask(mb, op, result, [&](ObjectManager& manager, const ObjectPath& path) {
         return manager.getInstance(path, {std::move(properties), principalOf(context)});
     });
     if (status.rc == CMPI_RC_OK && (result.instances.empty() || !result.instances.front())) {
@@ -237,10 +239,11 @@ CMPIEnumeration* associators(const CMPIBroker* mb, const CMPIContext* context,
                              const char* resultClass, const char* role, const char* resultRole,
                              const char** properties, CMPIStatus* rc) {
     InstancesResult result;
-    const CMPIStatus status = ask(mb, op, result, [&](ObjectManager& manager, ObjectPath path) {
-        return manager.associators(path, associationRequest(context, assocClass, resultClass, role,
-                                                            resultRole, properties));
-    });
+    const CMPIStatus status =
+        ask(mb, op, result, [&](ObjectManager& manager, const ObjectPath& path) {
+            return manager.associators(path, associationRequest(context, assocClass, resultClass,
+                                                                role, resultRole, properties));
+        });
     return enumerationFrom(mb, status, rc, result.instances);
 }
 
@@ -249,10 +252,12 @@ CMPIEnumeration* associatorNames(const CMPIBroker* mb, const CMPIContext* contex
                                  const char* resultClass, const char* role, const char* resultRole,
                                  CMPIStatus* rc) {
     PathsResult result;
-    const CMPIStatus status = ask(mb, op, result, [&](ObjectManager& manager, ObjectPath path) {
-        return manager.associatorNames(
-            path, associationRequest(context, assocClass, resultClass, role, resultRole, nullptr));
-    });
+    const CMPIStatus status =
+        ask(mb, op, result, [&](ObjectManager& manager, const ObjectPath& path) {
+            return manager.associatorNames(
+                path,
+                associationRequest(context, assocClass, resultClass, role, resultRole, nullptr));
+        });
     return enumerationFrom(mb, status, rc, result.paths);
 }
 
@@ -260,10 +265,11 @@ CMPIEnumeration* references(const CMPIBroker* mb, const CMPIContext* context,
                             const CMPIObjectPath* op, const char* resultClass, const char* role,
                             const char** properties, CMPIStatus* rc) {
     InstancesResult result;
-    const CMPIStatus status = ask(mb, op, result, [&](ObjectManager& manager, ObjectPath path) {
-        return manager.references(
-            path, associationRequest(context, nullptr, resultClass, role, nullptr, properties));
-    });
+    const CMPIStatus status =
+        ask(mb, op, result, [&](ObjectManager& manager, const ObjectPath& path) {
+            return manager.references(
+                path, associationRequest(context, nullptr, resultClass, role, nullptr, properties));
+        });
     return enumerationFrom(mb, status, rc, result.instances);
 }
 
@@ -271,10 +277,11 @@ CMPIEnumeration* referenceNames(const CMPIBroker* mb, const CMPIContext* context
                                 const CMPIObjectPath* op, const char* resultClass, const char* role,
                                 CMPIStatus* rc) {
     PathsResult result;
-    const CMPIStatus status = ask(mb, op, result, [&](ObjectManager& manager, ObjectPath path) {
-        return manager.referenceNames(
-            path, associationRequest(context, nullptr, resultClass, role, nullptr, nullptr));
-    });
+    const CMPIStatus status =
+        ask(mb, op, result, [&](ObjectManager& manager, const ObjectPath& path) {
+            return manager.referenceNames(
+                path, associationRequest(context, nullptr, resultClass, role, nullptr, nullptr));
+        });
     return enumerationFrom(mb, status, rc, result.paths);
 }
 

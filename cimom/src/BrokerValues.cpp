@@ -140,7 +140,7 @@ void EntryList::reserve(Arena& arena, CMPICount capacity) {
     if (capacity <= capacity_) {
         return;
     }
-    Entry* const larger = arena.makeMany<Entry>(capacity);
+    auto* const larger = arena.makeMany<Entry>(capacity);
     std::copy_n(entries_, size_, larger);
     entries_ = larger;
     capacity_ = capacity;

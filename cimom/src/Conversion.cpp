@@ -235,7 +235,7 @@ CMPIData toData(Arena& arena, const Schema* schema, const Value& value) {
     if (const Scalar* const scalar = value.scalar()) {
         return scalarData(arena, schema, value.type, *scalar);
     }
-    const Array& elements = std::get<Array>(value.content);
+    const auto& elements = std::get<Array>(value.content);
     if (elements.size() > std::numeric_limits<CMPICount>::max()) {
         throw ConversionError("an array of that length");
     }

@@ -136,8 +136,8 @@ InstancesResult ObjectManager::Implementation::getFrom(const ServedClass& target
         result.instances.clear();
         return result;
     }
-    std::optional<Instance> instance = std::move(*found);
-    result.instances.assign(1, std::move(instance));
+    std::swap(result.instances.front(), *found);
+    result.instances.resize(1);
     return result;
 }
 

@@ -71,7 +71,9 @@ void ObjectManager::Implementation::serve(const Registration& registration) {
             const ServedClass& other = served_[index];
             if (other.isIn(nameSpace) && ((other.instance && served.instance) ||
                                           (other.association && served.association))) {
-                throw LoadError(who + " is registered twice for namespace " + nameSpace);
+                throw LoadError(std::string(who)
+                                    .append(" is registered twice for namespace ")
+                                    .append(nameSpace));
             }
         }
         served.nameSpaces.push_back(nameSpace);

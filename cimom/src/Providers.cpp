@@ -90,7 +90,7 @@ Record* Provider::record(std::atomic<Record*>& slot, const char* kind, const std
     }
     struct Creating {
         bool& flag;
-        explicit Creating(bool& creating) : flag(creating) { flag = true; }
+        explicit Creating(bool& creating) : flag(creating) { creating = true; }
         ~Creating() { flag = false; }
         Creating(const Creating&) = delete;
         Creating& operator=(const Creating&) = delete;
@@ -100,7 +100,7 @@ Record* Provider::record(std::atomic<Record*>& slot, const char* kind, const std
         const ProviderLibrary& library = *loaded.library;
         const CMPIBroker* const broker = loaded.broker->record();
         const Creating creating(creating_);
-        Record* const made = create<Record>(library, broker, name_, kind, nameSpace, status);
+        auto* const made = create<Record>(library, broker, name_, kind, nameSpace, status);
         slot.store(made, std::memory_order_release);
         return made;
     } catch (const LoadError& error) {

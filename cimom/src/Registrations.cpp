@@ -1,8 +1,10 @@
+#include <algorithm>
 #include <cerrno>
 #include <cstring>
 #include <fstream>
 #include <optional>
 #include <sstream>
+#include <utility>
 
 #include "Names.h"
 #include "cimom/ObjectManager.h"
@@ -22,21 +24,13 @@ std::string_view trimmed(std::string_view text) noexcept {
 }
 
 bool isName(std::string_view text) noexcept {
-    if (text.empty() || !isNameStart(text.front())) {
-        return false;
-    }
-    for (const char letter : text) {
-        if (!isNamePart(letter)) {
-            return false;
-        }
-    }
-    return true;
+    return !text.empty() && isNameStart(text.front()) && std::ranges::all_of(text, isNamePart);
 }
 
 /// Reads line by line; a section ends with the next one or with the file.
 class RegistrationReader {
   public:
-    explicit RegistrationReader(const std::filesystem::path& file) : file_(file) {}
+    explicit RegistrationReader(std::filesystem::path file) : file_(std::move(file)) {}
 
     std::vector<Registration> read() {
         std::ifstream stream(file_);
@@ -140,7 +134,7 @@ class RegistrationReader {
         if (value.find_first_of(blanks) != std::string_view::npos ||
             value.find('/') != std::string_view::npos) {
             fail(line_, "\"" + std::string(value) + "\" is no name for \"" + std::string(key) +
-                            ":\": blanks and \"/\" cannot be in it");
+                            R"(:": blanks and "/" cannot be in it)");
         }
         member = value;
     }

@@ -1,8 +1,6 @@
 #include "CMPI/CMPIDHCPCapabilities.h"
 
-#include <utility>
-
-#include "CMPI/ElementAdapter.h"
+#include <array>
 
 namespace ZR::DHCPClientProvider {
 
@@ -11,8 +9,6 @@ const std::string loggerCMPIDHCPCapabilities = loggerCategory;
 namespace {
 
 using Element = DHCPCapabilities;
-
-const TraceSource source{"CMPI/CMPIDHCPCapabilities", loggerCMPIDHCPCapabilities};
 
 constexpr std::array<FilterKey<Element>, 1> filterKeys{{
     {"InstanceID", Element::FilterByInstanceID, false},
@@ -35,48 +31,12 @@ constexpr std::array<ElementProperty<Element>, 8> instanceProperties{{
 
 }  // namespace
 
-CMPIDHCPCapabilities::CMPIDHCPCapabilities(const CMPIBroker* broker, const CMPIContext* context,
-                                           std::string nameSpace)
-    : _broker(broker), _context(context), _namespace(std::move(nameSpace)) {
-    traceMethod(ZR_HERE);
-}
+const RowSource DHCPCapabilitiesRow::trace{
+    {"CMPI/CMPIDHCPCapabilities", loggerCMPIDHCPCapabilities}, "~CMPIDHCPCapabilities", __LINE__};
 
-CMPIDHCPCapabilities::CMPIDHCPCapabilities(const CMPIBroker* broker, const CMPIContext* context,
-                                           const CMPIObjectPath* objectPath)
-    : _broker(broker), _context(context), _namespace(ProviderUtilities::getNamespace(objectPath)) {
-    const ParameterScope scope(ZR_HERE, " _broker=", _broker, " _context=", _context,
-                               " objectPath=", objectPath);
-    setObjectPath(objectPath);
-}
+const ElementClass<Element> DHCPCapabilitiesRow::elementClass{"QVXZR_DHCPCapabilities", filterKeys,
+                                                              pathKeys, instanceProperties};
 
-CMPIDHCPCapabilities::~CMPIDHCPCapabilities() {
-    traceMethod(ZR_HERE);
-}
-
-void CMPIDHCPCapabilities::setObjectPath(const CMPIObjectPath* objectPath) {
-    const ParameterScope scope(ZR_HERE, " objectPath=", objectPath);
-    filterByKeys(element_, objectPath, filterKeys, ZR_HERE);
-}
-
-CMPIDHCPCapabilities::operator bool() {
-    traceMethod(ZR_HERE);
-    return static_cast<bool>(element_);
-}
-
-void CMPIDHCPCapabilities::operator++() {
-    traceMethod(ZR_HERE);
-    ++element_;
-}
-
-CMPIObjectPath* CMPIDHCPCapabilities::getObjectPath() const {
-    const TraceScope scope(ZR_HERE);
-    return makeObjectPath(_broker, "QVXZR_DHCPCapabilities", _namespace, element_, pathKeys,
-                          ZR_HERE);
-}
-
-CMPIInstance* CMPIDHCPCapabilities::getCMPIInstance(const char** properties) const {
-    const ParameterScope scope(ZR_HERE, " properties=", properties);
-    return makeInstance(_broker, getObjectPath(), element_, instanceProperties);
-}
+template class ElementAdapter<DHCPCapabilitiesRow>;
 
 }  // namespace ZR::DHCPClientProvider

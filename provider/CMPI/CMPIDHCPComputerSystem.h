@@ -1,46 +1,22 @@
 #pragma once
 
-#include <cmpift.h>
-
-#include <string>
+#include "CMPI/ReferencedAdapter.h"
 
 namespace ZR::DHCPClientProvider {
 
 extern const std::string loggerCMPIDHCPComputerSystem;
 
-/// Fetches computer systems from the object manager, as ends of
-/// associations: instances of "QVXZR_ComputerSystem" that other providers serve.
-///
-/// Placed, the adapter stands on the first instance. It is walked so: the first
-/// element, then further ones only as long as another follows the present one;
-/// operator bool is asked exactly once per step. Of two instances the second is
-/// thus never delivered; with one, the usual case, the walk is right.
-class CMPIDHCPComputerSystem {
-  public:
-    CMPIDHCPComputerSystem(const CMPIBroker* broker, const CMPIContext* context,
-                           std::string nameSpace);
-    ~CMPIDHCPComputerSystem();
-    CMPIDHCPComputerSystem(const CMPIDHCPComputerSystem&) = delete;
-    CMPIDHCPComputerSystem& operator=(const CMPIDHCPComputerSystem&) = delete;
-
-    /// Stands on the first of all instances of the path's class, whatever its keys.
-    /// Throws ProviderException when the object manager refuses.
-    void setObjectPath(const CMPIObjectPath* objectPath);
-
-    explicit operator bool();
-    void operator++();
-
-    /// The path that the present instance tells of itself; null without one.
-    [[nodiscard]] CMPIObjectPath* getObjectPath() const;
-    CMPIInstance* getCMPIInstance(const char** properties) const;
-
-  private:
-    const CMPIBroker* _broker;
-    const CMPIContext* _context;
-    std::string _namespace;
-    CMPIInstance* instance_ = nullptr;
-    CMPIEnumeration* enumeration_ = nullptr;
-    bool first_ = false;
+struct DHCPComputerSystemRow {
+    static const RowSource trace;
+    static constexpr const char* refusal = noComputerSystem;
+    static constexpr bool asksBeforeFirst = true;
+    static constexpr bool asksBeforeNext = false;
+    static constexpr bool fetchesSingly = false;
 };
+
+extern template class ReferencedAdapter<DHCPComputerSystemRow>;
+
+/// Fetches computer systems: "QVXZR_ComputerSystem".
+using CMPIDHCPComputerSystem = ReferencedAdapter<DHCPComputerSystemRow>;
 
 }  // namespace ZR::DHCPClientProvider

@@ -1,10 +1,6 @@
 #pragma once
 
-#include <cmpift.h>
-
-#include <cstdint>
-#include <string>
-
+#include "CMPI/AssociationAdapter.h"
 #include "CMPI/CMPIDHCPCapabilities.h"
 #include "CMPI/CMPIDHCPProtocolEndpoint.h"
 #include "Lindows/ElementCapabilities.h"
@@ -13,37 +9,23 @@ namespace ZR::DHCPClientProvider {
 
 extern const std::string loggerCMPIDHCPElementCapabilities;
 
-/// Serves "QVXZR_DHCPElementCapabilities": a DHCP protocol endpoint
-/// ("ManagedElement") and its capabilities ("Capabilities").
-/// Built, walked and asked as CMPIDHCPHostedAccessPoint is.
-class CMPIDHCPElementCapabilities {
-  public:
-    CMPIDHCPElementCapabilities(const CMPIBroker* broker, const CMPIContext* context,
-                                const CMPIObjectPath* objectPath);
-    ~CMPIDHCPElementCapabilities();
-    CMPIDHCPElementCapabilities(const CMPIDHCPElementCapabilities&) = delete;
-    CMPIDHCPElementCapabilities& operator=(const CMPIDHCPElementCapabilities&) = delete;
+struct DHCPElementCapabilitiesAssociation {
+    using First = CMPIDHCPProtocolEndpoint;
+    using Second = CMPIDHCPCapabilities;
+    using Record = ElementCapabilities;
 
-    explicit operator bool();
-    void operator++();
-    bool isNotTargetClass(const char* resultClass) const;
-
-    CMPIObjectPath* getAssociatorNames();
-    CMPIInstance* getAssociator(const char** properties);
-    CMPIObjectPath* getObjectPath();
-    CMPIInstance* getCMPIInstance(const char** properties);
-
-    CMPIObjectPath* locateDHCPProtocolEndpoint(const CMPIObjectPath* objectPath);
-    CMPIObjectPath* locateCapabilities(const CMPIObjectPath* objectPath);
-
-  private:
-    const CMPIBroker* _broker;
-    const CMPIContext* _context;
-    std::string _namespace;
-    std::int32_t requestedClassId_;
-    CMPIDHCPProtocolEndpoint endpoint_;
-    CMPIDHCPCapabilities capabilities_;
-    ElementCapabilities record_;
+    static const RowSource trace;
+    static const AssociationClass<Record> associationClass;
+    static constexpr End walked = End::first;
+    static constexpr End referencedFirst = End::first;
+    static constexpr Reference other = Reference::located;
+    static constexpr Placing firstAsSource = Placing::all;
+    static constexpr Placing firstLocated = Placing::all;
 };
+
+extern template class AssociationAdapter<DHCPElementCapabilitiesAssociation>;
+
+/// Serves "QVXZR_DHCPElementCapabilities": a DHCP protocol endpoint and its DHCP capabilities.
+using CMPIDHCPElementCapabilities = AssociationAdapter<DHCPElementCapabilitiesAssociation>;
 
 }  // namespace ZR::DHCPClientProvider

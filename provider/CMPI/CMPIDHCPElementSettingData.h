@@ -1,10 +1,6 @@
 #pragma once
 
-#include <cmpift.h>
-
-#include <cstdint>
-#include <string>
-
+#include "CMPI/AssociationAdapter.h"
 #include "CMPI/CMPIDHCPProtocolEndpoint.h"
 #include "CMPI/CMPIDHCPSettingData.h"
 #include "Lindows/DHCPElementSettingData.h"
@@ -13,37 +9,24 @@ namespace ZR::DHCPClientProvider {
 
 extern const std::string loggerCMPIDHCPElementSettingData;
 
-/// Serves "QVXZR_DHCPElementSettingData": a DHCP protocol endpoint
-/// ("ManagedElement") and the DHCP setting data of its interface ("SettingData").
-/// Built, walked and asked as CMPIDHCPHostedAccessPoint is.
-class CMPIDHCPElementSettingData {
-  public:
-    CMPIDHCPElementSettingData(const CMPIBroker* broker, const CMPIContext* context,
-                               const CMPIObjectPath* objectPath);
-    ~CMPIDHCPElementSettingData();
-    CMPIDHCPElementSettingData(const CMPIDHCPElementSettingData&) = delete;
-    CMPIDHCPElementSettingData& operator=(const CMPIDHCPElementSettingData&) = delete;
+struct DHCPElementSettingDataAssociation {
+    using First = CMPIDHCPProtocolEndpoint;
+    using Second = CMPIDHCPSettingData;
+    using Record = DHCPElementSettingData;
 
-    explicit operator bool();
-    void operator++();
-    bool isNotTargetClass(const char* resultClass) const;
-
-    CMPIObjectPath* getAssociatorNames();
-    CMPIInstance* getAssociator(const char** properties);
-    CMPIObjectPath* getObjectPath();
-    CMPIInstance* getCMPIInstance(const char** properties);
-
-    CMPIObjectPath* locateDHCPEndptPath(const CMPIObjectPath* objectPath);
-    CMPIObjectPath* locateDHCPSettingDataPath(const CMPIObjectPath* objectPath);
-
-  private:
-    const CMPIBroker* _broker;
-    const CMPIContext* _context;
-    std::string _namespace;
-    std::int32_t requestedClassId_;
-    CMPIDHCPProtocolEndpoint endpoint_;
-    CMPIDHCPSettingData setting_;
-    DHCPElementSettingData record_;
+    static const RowSource trace;
+    static const AssociationClass<Record> associationClass;
+    static constexpr End walked = End::second;
+    static constexpr End referencedFirst = End::second;
+    static constexpr Reference other = Reference::located;
+    static constexpr Placing firstAsSource = Placing::all;
+    static constexpr Placing firstLocated = Placing::all;
 };
+
+extern template class AssociationAdapter<DHCPElementSettingDataAssociation>;
+
+/// Serves "QVXZR_DHCPElementSettingData": a DHCP protocol endpoint and the DHCP setting data of
+/// its interface.
+using CMPIDHCPElementSettingData = AssociationAdapter<DHCPElementSettingDataAssociation>;
 
 }  // namespace ZR::DHCPClientProvider

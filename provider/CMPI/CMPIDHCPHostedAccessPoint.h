@@ -1,10 +1,6 @@
 #pragma once
 
-#include <cmpift.h>
-
-#include <cstdint>
-#include <string>
-
+#include "CMPI/AssociationAdapter.h"
 #include "CMPI/CMPIDHCPComputerSystem.h"
 #include "CMPI/CMPIDHCPProtocolEndpoint.h"
 #include "Lindows/HostedAccessPoint.h"
@@ -13,41 +9,28 @@ namespace ZR::DHCPClientProvider {
 
 extern const std::string loggerCMPIDHCPHostedAccessPoint;
 
-/// Serves "QVXZR_HostedDHCPPoint": a computer system ("Antecedent") and the DHCP
-/// protocol endpoints that it hosts ("Dependent").
-///
-/// An association adapter is built for one request from the path that the client
-/// names, and walked: operator bool is asked exactly once per step. What it hands
-/// out belongs to the broker, which may also refuse: the answer is then null.
-/// Exceptions of its ends and of its record pass. Used by one thread.
-class CMPIDHCPHostedAccessPoint {
-  public:
-    CMPIDHCPHostedAccessPoint(const CMPIBroker* broker, const CMPIContext* context,
-                              const CMPIObjectPath* objectPath);
-    ~CMPIDHCPHostedAccessPoint();
-    CMPIDHCPHostedAccessPoint(const CMPIDHCPHostedAccessPoint&) = delete;
-    CMPIDHCPHostedAccessPoint& operator=(const CMPIDHCPHostedAccessPoint&) = delete;
+struct DHCPHostedAccessPointAssociation {
+    using First = CMPIDHCPComputerSystem;
+    using Second = CMPIDHCPProtocolEndpoint;
+    using Record = DHCPHostedAccessPoint;
+    using Adapter = AssociationAdapter<DHCPHostedAccessPointAssociation>;
 
-    explicit operator bool();
-    void operator++();
-    bool isNotTargetClass(const char* resultClass) const;
+    static const RowSource trace;
+    static const AssociationClass<Record> associationClass;
+    static constexpr End walked = End::second;
+    static constexpr End referencedFirst = End::first;
+    static constexpr Reference other = Reference::own;
+    static constexpr Placing firstAsSource = Placing::all;
+    static constexpr Placing firstLocated = Placing::all;
 
-    CMPIObjectPath* getAssociatorNames();
-    CMPIInstance* getAssociator(const char** properties);
-    CMPIObjectPath* getObjectPath();
-    CMPIInstance* getCMPIInstance(const char** properties);
-
-    CMPIObjectPath* locateComputer(const CMPIObjectPath* objectPath);
-    CMPIObjectPath* locateDHCPProtocolEndpoint(const CMPIObjectPath* objectPath);
-
-  private:
-    const CMPIBroker* _broker;
-    const CMPIContext* _context;
-    std::string _namespace;
-    std::int32_t requestedClassId_;
-    CMPIDHCPComputerSystem computer_;
-    CMPIDHCPProtocolEndpoint endpoint_;
-    DHCPHostedAccessPoint record_;
+    // The pairs run over the endpoints of one computer after the other.
+    static bool stands(Adapter& adapter);
+    static void step(Adapter& adapter);
 };
+
+extern template class AssociationAdapter<DHCPHostedAccessPointAssociation>;
+
+/// Serves "QVXZR_HostedDHCPPoint": a computer system and the DHCP protocol endpoints that it hosts.
+using CMPIDHCPHostedAccessPoint = AssociationAdapter<DHCPHostedAccessPointAssociation>;
 
 }  // namespace ZR::DHCPClientProvider

@@ -1,10 +1,6 @@
 #pragma once
 
-#include <cmpift.h>
-
-#include <cstdint>
-#include <string>
-
+#include "CMPI/AssociationAdapter.h"
 #include "CMPI/CMPIDHCPAssignmentSettingData.h"
 #include "CMPI/CMPIDHCPSettingData.h"
 #include "Lindows/DHCPOrderedComponent.h"
@@ -13,41 +9,30 @@ namespace ZR::DHCPClientProvider {
 
 extern const std::string loggerCMPIDHCPOrderedComponent;
 
-/// Serves "QVXZR_DHCPOrderedComponent": an IP assignment setting data
-/// ("GroupComponent") and the DHCP setting data in it ("PartComponent").
-/// Built, walked and asked as CMPIDHCPHostedAccessPoint is.
-class CMPIDHCPOrderedComponent {
-  public:
-    CMPIDHCPOrderedComponent(const CMPIBroker* broker, const CMPIContext* context,
-                             const CMPIObjectPath* objectPath);
-    ~CMPIDHCPOrderedComponent();
-    CMPIDHCPOrderedComponent(const CMPIDHCPOrderedComponent&) = delete;
-    CMPIDHCPOrderedComponent& operator=(const CMPIDHCPOrderedComponent&) = delete;
+struct DHCPOrderedComponentAssociation {
+    using First = CMPIDHCPAssignmentSettingData;
+    using Second = CMPIDHCPSettingData;
+    using Record = DHCPOrderedComponent;
+    using Adapter = AssociationAdapter<DHCPOrderedComponentAssociation>;
 
-    explicit operator bool();
-    void operator++();
-    bool isNotTargetClass(const char* resultClass) const;
+    static const RowSource trace;
+    static const AssociationClass<Record> associationClass;
+    static constexpr End walked = End::second;
+    static constexpr End referencedFirst = End::second;
+    static constexpr Reference other = Reference::located;
+    static constexpr Placing firstAsSource = Placing::single;
+    static constexpr Placing firstLocated = Placing::single;
 
-    CMPIObjectPath* getAssociatorNames();
-    CMPIInstance* getAssociator(const char** properties);
-    CMPIObjectPath* getObjectPath();
-    CMPIInstance* getCMPIInstance(const char** properties);
-
-    CMPIObjectPath* locateAssignmentSetting(const CMPIObjectPath* objectPath);
-    CMPIObjectPath* locateDhcpAssignmentSetting(const CMPIObjectPath* objectPath);
-
+    static void place(Adapter& adapter, const CMPIObjectPath* objectPath);
     /// Narrows the ends to the references of an association path, as far as it has
     /// them. False, with nothing done, when the path has no keys at all.
-    bool setObjectPath(const CMPIObjectPath* objectPath);
-
-  private:
-    const CMPIBroker* _broker;
-    const CMPIContext* _context;
-    std::string _namespace;
-    std::int32_t requestedClassId_;
-    CMPIDHCPAssignmentSettingData assignment_;
-    CMPIDHCPSettingData setting_;
-    DHCPOrderedComponent record_;
+    static bool setObjectPath(Adapter& adapter, const CMPIObjectPath* objectPath);
 };
+
+extern template class AssociationAdapter<DHCPOrderedComponentAssociation>;
+
+/// Serves "QVXZR_DHCPOrderedComponent": an IP assignment setting data and the DHCP setting data
+/// in it.
+using CMPIDHCPOrderedComponent = AssociationAdapter<DHCPOrderedComponentAssociation>;
 
 }  // namespace ZR::DHCPClientProvider

@@ -1,8 +1,6 @@
 #include "CMPI/CMPIDHCPProtocolEndpoint.h"
 
-#include <utility>
-
-#include "CMPI/ElementAdapter.h"
+#include <array>
 
 namespace ZR::DHCPClientProvider {
 
@@ -11,8 +9,6 @@ const std::string loggerCMPIDHCPProtocolEndpoint = loggerCategory;
 namespace {
 
 using Element = DHCPProtocolEndpoint;
-
-const TraceSource source{"CMPI/CMPIDHCPProtocolEndpoint", loggerCMPIDHCPProtocolEndpoint};
 
 constexpr std::array<FilterKey<Element>, 2> filterKeys{{
     {"SystemName", Element::FilterBySystemName, false},
@@ -64,50 +60,14 @@ constexpr std::array<ElementProperty<Element>, 33> instanceProperties{{
 
 }  // namespace
 
-CMPIDHCPProtocolEndpoint::CMPIDHCPProtocolEndpoint(const CMPIBroker* broker,
-                                                   const CMPIContext* context,
-                                                   std::string nameSpace)
-    : _broker(broker), _context(context), _namespace(std::move(nameSpace)) {
-    traceMethod(ZR_HERE);
-}
+const RowSource DHCPProtocolEndpointRow::trace{
+    {"CMPI/CMPIDHCPProtocolEndpoint", loggerCMPIDHCPProtocolEndpoint},
+    "~CMPIDHCPProtocolEndpoint",
+    __LINE__};
 
-CMPIDHCPProtocolEndpoint::CMPIDHCPProtocolEndpoint(const CMPIBroker* broker,
-                                                   const CMPIContext* context,
-                                                   const CMPIObjectPath* objectPath)
-    : _broker(broker), _context(context), _namespace(ProviderUtilities::getNamespace(objectPath)) {
-    const ParameterScope scope(ZR_HERE, " _broker=", _broker, " _context=", _context,
-                               " objectPath=", objectPath);
-    setObjectPath(objectPath);
-}
+const ElementClass<Element> DHCPProtocolEndpointRow::elementClass{
+    "QVXZR_DHCPProtocolEndpoint", filterKeys, pathKeys, instanceProperties};
 
-CMPIDHCPProtocolEndpoint::~CMPIDHCPProtocolEndpoint() {
-    traceMethod(ZR_HERE);
-}
-
-void CMPIDHCPProtocolEndpoint::setObjectPath(const CMPIObjectPath* objectPath) {
-    const ParameterScope scope(ZR_HERE, " objectPath=", objectPath);
-    filterByKeys(element_, objectPath, filterKeys, ZR_HERE);
-}
-
-CMPIDHCPProtocolEndpoint::operator bool() {
-    traceMethod(ZR_HERE);
-    return static_cast<bool>(element_);
-}
-
-void CMPIDHCPProtocolEndpoint::operator++() {
-    traceMethod(ZR_HERE);
-    ++element_;
-}
-
-CMPIObjectPath* CMPIDHCPProtocolEndpoint::getObjectPath() const {
-    const TraceScope scope(ZR_HERE);
-    return makeObjectPath(_broker, "QVXZR_DHCPProtocolEndpoint", _namespace, element_, pathKeys,
-                          ZR_HERE);
-}
-
-CMPIInstance* CMPIDHCPProtocolEndpoint::getCMPIInstance(const char** properties) const {
-    const ParameterScope scope(ZR_HERE, " properties=", properties);
-    return makeInstance(_broker, getObjectPath(), element_, instanceProperties);
-}
+template class ElementAdapter<DHCPProtocolEndpointRow>;
 
 }  // namespace ZR::DHCPClientProvider

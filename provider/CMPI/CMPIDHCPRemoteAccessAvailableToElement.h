@@ -1,10 +1,6 @@
 #pragma once
 
-#include <cmpift.h>
-
-#include <cstdint>
-#include <string>
-
+#include "CMPI/AssociationAdapter.h"
 #include "CMPI/CMPIDHCPProtocolEndpoint.h"
 #include "CMPI/CMPIDHCPRemoteServiceAccessPoint.h"
 #include "Lindows/DHCPRemoteAccessAvailableToElement.h"
@@ -13,38 +9,25 @@ namespace ZR::DHCPClientProvider {
 
 extern const std::string loggerCMPIDHCPRemoteAccessAvailableToElement;
 
-/// Serves "QVXZR_DHCPRemoteAccessAvailableToElement": a remote access point (DHCP
-/// server, "Antecedent") and the DHCP protocol endpoint that uses it ("Dependent").
-/// Built, walked and asked as CMPIDHCPHostedAccessPoint is.
-class CMPIDHCPRemoteAccessAvailableToElement {
-  public:
-    CMPIDHCPRemoteAccessAvailableToElement(const CMPIBroker* broker, const CMPIContext* context,
-                                           const CMPIObjectPath* objectPath);
-    ~CMPIDHCPRemoteAccessAvailableToElement();
-    CMPIDHCPRemoteAccessAvailableToElement(const CMPIDHCPRemoteAccessAvailableToElement&) = delete;
-    CMPIDHCPRemoteAccessAvailableToElement& operator=(
-        const CMPIDHCPRemoteAccessAvailableToElement&) = delete;
+struct DHCPRemoteAccessAvailableToElementAssociation {
+    using First = CMPIDHCPRemoteServiceAccessPoint;
+    using Second = CMPIDHCPProtocolEndpoint;
+    using Record = DHCPRemoteAccessAvailableToElement;
 
-    explicit operator bool();
-    void operator++();
-    bool isNotTargetClass(const char* resultClass) const;
-
-    CMPIObjectPath* getAssociatorNames();
-    CMPIInstance* getAssociator(const char** properties);
-    CMPIObjectPath* getObjectPath();
-    CMPIInstance* getCMPIInstance(const char** properties);
-
-    CMPIObjectPath* locateRemoteSAP(const CMPIObjectPath* objectPath);
-    CMPIObjectPath* locateDHCPEndptPath(const CMPIObjectPath* objectPath);
-
-  private:
-    const CMPIBroker* _broker;
-    const CMPIContext* _context;
-    std::string _namespace;
-    std::int32_t requestedClassId_;
-    CMPIDHCPRemoteServiceAccessPoint accessPoint_;
-    CMPIDHCPProtocolEndpoint endpoint_;
-    DHCPRemoteAccessAvailableToElement record_;
+    static const RowSource trace;
+    static const AssociationClass<Record> associationClass;
+    static constexpr End walked = End::first;
+    static constexpr End referencedFirst = End::first;
+    static constexpr Reference other = Reference::located;
+    static constexpr Placing firstAsSource = Placing::all;
+    static constexpr Placing firstLocated = Placing::all;
 };
+
+extern template class AssociationAdapter<DHCPRemoteAccessAvailableToElementAssociation>;
+
+/// Serves "QVXZR_DHCPRemoteAccessAvailableToElement": a remote access point (DHCP server) and
+/// the DHCP protocol endpoint that uses it.
+using CMPIDHCPRemoteAccessAvailableToElement =
+    AssociationAdapter<DHCPRemoteAccessAvailableToElementAssociation>;
 
 }  // namespace ZR::DHCPClientProvider

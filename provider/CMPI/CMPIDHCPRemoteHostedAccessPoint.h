@@ -1,10 +1,6 @@
 #pragma once
 
-#include <cmpift.h>
-
-#include <cstdint>
-#include <string>
-
+#include "CMPI/AssociationAdapter.h"
 #include "CMPI/CMPIDHCPComputerSystem.h"
 #include "CMPI/CMPIDHCPRemoteServiceAccessPoint.h"
 #include "Lindows/DHCPRemoteHostedAccessPoint.h"
@@ -13,37 +9,27 @@ namespace ZR::DHCPClientProvider {
 
 extern const std::string loggerCMPIDHCPRemoteHostedAccessPoint;
 
-/// Serves "QVXZR_DHCPRemoteHostedAccessPoint": a computer system ("Antecedent") and
-/// the remote access points (DHCP servers) known on it ("Dependent").
-/// Built, walked and asked as CMPIDHCPHostedAccessPoint is.
-class CMPIDHCPRemoteHostedAccessPoint {
-  public:
-    CMPIDHCPRemoteHostedAccessPoint(const CMPIBroker* broker, const CMPIContext* context,
-                                    const CMPIObjectPath* objectPath);
-    ~CMPIDHCPRemoteHostedAccessPoint();
-    CMPIDHCPRemoteHostedAccessPoint(const CMPIDHCPRemoteHostedAccessPoint&) = delete;
-    CMPIDHCPRemoteHostedAccessPoint& operator=(const CMPIDHCPRemoteHostedAccessPoint&) = delete;
+struct DHCPRemoteHostedAccessPointAssociation {
+    using First = CMPIDHCPComputerSystem;
+    using Second = CMPIDHCPRemoteServiceAccessPoint;
+    using Record = DHCPRemoteHostedAccessPoint;
+    using Adapter = AssociationAdapter<DHCPRemoteHostedAccessPointAssociation>;
 
-    explicit operator bool();
-    void operator++();
-    bool isNotTargetClass(const char* resultClass) const;
+    static const RowSource trace;
+    static const AssociationClass<Record> associationClass;
+    static constexpr End walked = End::second;
+    static constexpr End referencedFirst = End::second;
+    static constexpr Reference other = Reference::own;
+    static constexpr Placing firstAsSource = Placing::all;
+    static constexpr Placing firstLocated = Placing::all;
 
-    CMPIObjectPath* getAssociatorNames();
-    CMPIInstance* getAssociator(const char** properties);
-    CMPIObjectPath* getObjectPath();
-    CMPIInstance* getCMPIInstance(const char** properties);
-
-    CMPIObjectPath* locateComputer(const CMPIObjectPath* objectPath);
-    CMPIObjectPath* locateRemoteSAP(const CMPIObjectPath* objectPath);
-
-  private:
-    const CMPIBroker* _broker;
-    const CMPIContext* _context;
-    std::string _namespace;
-    std::int32_t requestedClassId_;
-    CMPIDHCPComputerSystem computer_;
-    CMPIDHCPRemoteServiceAccessPoint accessPoint_;
-    DHCPRemoteHostedAccessPoint record_;
+    static bool stands(Adapter& adapter);
 };
+
+extern template class AssociationAdapter<DHCPRemoteHostedAccessPointAssociation>;
+
+/// Serves "QVXZR_DHCPRemoteHostedAccessPoint": a computer system and the remote access points
+/// (DHCP servers) known on it.
+using CMPIDHCPRemoteHostedAccessPoint = AssociationAdapter<DHCPRemoteHostedAccessPointAssociation>;
 
 }  // namespace ZR::DHCPClientProvider

@@ -1,8 +1,6 @@
 #include "CMPI/CMPIDHCPSettingData.h"
 
-#include <utility>
-
-#include "CMPI/ElementAdapter.h"
+#include <array>
 
 namespace ZR::DHCPClientProvider {
 
@@ -11,8 +9,6 @@ const std::string loggerCMPIDHCPSettingData = loggerCategory;
 namespace {
 
 using Element = DHCPSettingData;
-
-const TraceSource source{"CMPI/CMPIDHCPSettingData", loggerCMPIDHCPSettingData};
 
 constexpr std::array<FilterKey<Element>, 1> filterKeys{{
     {"InstanceID", Element::FilterByInstanceID, false},
@@ -37,64 +33,22 @@ constexpr std::array<ElementProperty<Element>, 9> instanceProperties{{
 
 }  // namespace
 
-CMPIDHCPSettingData::CMPIDHCPSettingData(const CMPIBroker* broker, const CMPIContext* context,
-                                         std::string nameSpace)
-    : _broker(broker), _context(context), _namespace(std::move(nameSpace)) {
-    traceMethod(ZR_HERE);
-}
+const RowSource DHCPSettingDataRow::trace{
+    {"CMPI/CMPIDHCPSettingData", loggerCMPIDHCPSettingData}, "~CMPIDHCPSettingData", __LINE__};
 
-CMPIDHCPSettingData::CMPIDHCPSettingData(const CMPIBroker* broker, const CMPIContext* context,
-                                         const CMPIObjectPath* objectPath)
-    : _broker(broker), _context(context), _namespace(ProviderUtilities::getNamespace(objectPath)) {
-    const ParameterScope scope(ZR_HERE, " _broker=", _broker, " _context=", _context,
-                               " objectPath=", objectPath);
-    setObjectPath(objectPath);
-}
+const ElementClass<Element> DHCPSettingDataRow::elementClass{"QVXZR_DHCPSettingData", filterKeys,
+                                                             pathKeys, instanceProperties};
 
-CMPIDHCPSettingData::~CMPIDHCPSettingData() {
-    traceMethod(ZR_HERE);
-}
-
-void CMPIDHCPSettingData::setObjectPath(const CMPIObjectPath* objectPath) {
-    const ParameterScope scope(ZR_HERE, " objectPath=", objectPath);
-    filterByKeys(element_, objectPath, filterKeys, ZR_HERE);
-}
-
-CMPIDHCPSettingData::operator bool() const {
-    traceMethod(ZR_HERE);
-    return static_cast<bool>(element_);
-}
-
-void CMPIDHCPSettingData::operator++() {
-    traceMethod(ZR_HERE);
-    ++element_;
-}
-
-CMPIObjectPath* CMPIDHCPSettingData::getObjectPath() const {
-    const TraceScope scope(ZR_HERE);
-    return makeObjectPath(_broker, "QVXZR_DHCPSettingData", _namespace, element_, pathKeys,
-                          ZR_HERE);
-}
-
-CMPIInstance* CMPIDHCPSettingData::getCMPIInstance(const char** properties) const {
-    const ParameterScope scope(ZR_HERE, " properties=", properties);
-    return makeInstance(_broker, getObjectPath(), element_, instanceProperties);
-}
-
-CMPIStatus CMPIDHCPSettingData::modifyInstance(const CMPIInstance* newInstance) {
-    const ParameterScope scope(ZR_HERE, " newInstance=", newInstance);
-    CMPIStatus status{CMPI_RC_OK, nullptr};
+CMPIStatus DHCPSettingDataRow::modify(const Element& element, const CMPIInstance* newInstance) {
     if (newInstance == nullptr) {
-        status.rc = CMPI_RC_ERR_FAILED;
-        return status;
+        return {CMPI_RC_ERR_FAILED, nullptr};
     }
     // Absent, null or no text: the name is empty, and is written as such.
     std::string name;
     ProviderUtilities::getProperty(newInstance, "ConfigurationName", name, false);
-    if (!element_.setConfigurationName(name)) {
-        status.rc = CMPI_RC_ERR_FAILED;
-    }
-    return status;
+    return {element.setConfigurationName(name) ? CMPI_RC_OK : CMPI_RC_ERR_FAILED, nullptr};
 }
+
+template class ElementAdapter<DHCPSettingDataRow>;
 
 }  // namespace ZR::DHCPClientProvider

@@ -1,10 +1,6 @@
 #pragma once
 
-#include <cmpift.h>
-
-#include <cstdint>
-#include <string>
-
+#include "CMPI/AssociationAdapter.h"
 #include "CMPI/CMPIDHCPProtocolEndpoint.h"
 #include "CMPI/CMPIIPProtocolEndpoint.h"
 #include "Lindows/SAPSAPDependency.h"
@@ -13,37 +9,28 @@ namespace ZR::DHCPClientProvider {
 
 extern const std::string loggerCMPISAPSAPDependency;
 
-/// Serves "QVXZR_SAPSAPDependency": an IP protocol endpoint ("Antecedent") and the
-/// DHCP protocol endpoint of its interface ("Dependent").
-/// Built, walked and asked as CMPIDHCPHostedAccessPoint is.
-class CMPISAPSAPDependency {
-  public:
-    CMPISAPSAPDependency(const CMPIBroker* broker, const CMPIContext* context,
-                         const CMPIObjectPath* objectPath);
-    ~CMPISAPSAPDependency();
-    CMPISAPSAPDependency(const CMPISAPSAPDependency&) = delete;
-    CMPISAPSAPDependency& operator=(const CMPISAPSAPDependency&) = delete;
+struct SAPSAPDependencyAssociation {
+    using First = CMPIIPProtocolEndpoint;
+    using Second = CMPIDHCPProtocolEndpoint;
+    using Record = SAPSAPDependency;
+    using Adapter = AssociationAdapter<SAPSAPDependencyAssociation>;
 
-    explicit operator bool();
-    void operator++();
-    bool isNotTargetClass(const char* resultClass) const;
+    static const RowSource trace;
+    static const AssociationClass<Record> associationClass;
+    static constexpr End walked = End::second;
+    static constexpr End referencedFirst = End::second;
+    static constexpr Reference other = Reference::located;
+    static constexpr Placing firstAsSource = Placing::all;
+    static constexpr Placing firstLocated = Placing::single;
 
-    CMPIObjectPath* getAssociatorNames();
-    CMPIInstance* getAssociator(const char** properties);
-    CMPIObjectPath* getObjectPath();
-    CMPIInstance* getCMPIInstance(const char** properties);
-
-    CMPIObjectPath* locateIPEndpoint(const CMPIObjectPath* objectPath);
-    CMPIObjectPath* locateDHCPEndpoint(const CMPIObjectPath* objectPath);
-
-  private:
-    const CMPIBroker* _broker;
-    const CMPIContext* _context;
-    std::string _namespace;
-    std::int32_t requestedClassId_;
-    CMPIIPProtocolEndpoint ipEndpoint_;
-    CMPIDHCPProtocolEndpoint dhcpEndpoint_;
-    SAPSAPDependency record_;
+    static void place(Adapter& adapter, const CMPIObjectPath* objectPath);
+    static void inspect(End located, const TracePoint& at, const Moniker& found);
 };
+
+extern template class AssociationAdapter<SAPSAPDependencyAssociation>;
+
+/// Serves "QVXZR_SAPSAPDependency": an IP protocol endpoint and the DHCP protocol endpoint of
+/// its interface.
+using CMPISAPSAPDependency = AssociationAdapter<SAPSAPDependencyAssociation>;
 
 }  // namespace ZR::DHCPClientProvider

@@ -2,160 +2,92 @@
 
 #include <cmpift.h>
 
-#include <array>
-#include <span>
 #include <string>
-#include <vector>
+#include <utility>
 
+#include "CMPI/ElementTables.h"
 #include "include/TracePoint.h"
 #include "providerutilities/ProviderUtilities.h"
 
-/// What the element adapters share: each is described by three tables (the keys
-/// that become filters, the keys of its object path, the properties of its
-/// instance), and these are the walks over them.
 namespace ZR::DHCPClientProvider {
 
-/// A key of an incoming path that becomes a filter of the element.
-template <typename Element>
-struct FilterKey {
-    const char* name;
-    typename Element::FilterType type;
-    bool traced;
+/// Serves the elements of one class as instances.
+///
+/// An element adapter is built for one request and walked: while it is true, ask
+/// it for an object path or an instance, and step on. What it hands out belongs to
+/// the broker, which may also refuse: the answer is then null. It borrows broker
+/// and context, and lets the exceptions of its element pass. Used by one thread.
+///
+/// A row has the type Element and, as static members, RowSource trace and
+/// ElementClass<Element> elementClass. One whose instances can be changed has
+/// modify(element, newInstance) besides, which answers a CMPIStatus.
+template <typename Row>
+class ElementAdapter {
+  public:
+    /// Stands on the first of all instances in a namespace.
+    ElementAdapter(const CMPIBroker* mb, const CMPIContext* context, std::string nameSpace)
+        : _broker(mb), _context(context), _namespace(std::move(nameSpace)) {
+        traceMethod(Row::trace.constructor());
+    }
+
+    /// Stands on the first instance that a path names, in the path's namespace.
+    ElementAdapter(const CMPIBroker* mb, const CMPIContext* context,
+                   const CMPIObjectPath* objectPath)
+        : _broker(mb), _context(context), _namespace(ProviderUtilities::getNamespace(objectPath)) {
+        const ParameterScope scope(Row::trace.constructor(), " _broker=", _broker,
+                                   " _context=", _context, " objectPath=", objectPath);
+        setObjectPath(objectPath);
+    }
+
+    ~ElementAdapter() { traceMethod(Row::trace.destructor()); }
+    ElementAdapter(const ElementAdapter&) = delete;
+    ElementAdapter& operator=(const ElementAdapter&) = delete;
+
+    /// Narrows the walk to the keys of the path that are filters of the class, as
+    /// far as it has them. Filters add up; none is ever taken away.
+    void setObjectPath(const CMPIObjectPath* objectPath) {
+        const TracePoint at = Row::trace.at(__func__);
+        const ParameterScope scope(at, " objectPath=", objectPath);
+        filterByKeys(element_, objectPath, Row::elementClass.filterKeys, at);
+    }
+
+    explicit operator bool() {
+        traceMethod(Row::trace.at(__func__));
+        return static_cast<bool>(element_);
+    }
+
+    void operator++() {
+        traceMethod(Row::trace.at(__func__));
+        ++element_;
+    }
+
+    [[nodiscard]] CMPIObjectPath* getObjectPath() const {
+        const TracePoint at = Row::trace.at(__func__);
+        const TraceScope scope(at);
+        return makeObjectPath(_broker, Row::elementClass.name, _namespace, element_,
+                              Row::elementClass.pathKeys, at);
+    }
+
+    /// The property list is not looked at: an instance always has all that is known.
+    CMPIInstance* getCMPIInstance(const char** properties) const {
+        const ParameterScope scope(Row::trace.at(__func__), " properties=", properties);
+        return makeInstance(_broker, getObjectPath(), element_, Row::elementClass.properties);
+    }
+
+    /// Writes what may be changed of the new instance to the element on which the
+    /// adapter stands. CMPI_RC_ERR_FAILED when there is no new instance, or the
+    /// element refuses.
+    template <typename Changed = Row>
+    CMPIStatus modifyInstance(const CMPIInstance* newInstance) {
+        const ParameterScope scope(Row::trace.at(__func__), " newInstance=", newInstance);
+        return Changed::modify(element_, newInstance);
+    }
+
+  private:
+    const CMPIBroker* _broker;
+    const CMPIContext* _context;
+    std::string _namespace;
+    typename Row::Element element_;
 };
-
-/// A key of the object path; `get` answers false when the element has no value for it.
-template <typename Element>
-struct PathKey {
-    const char* name;
-    bool (Element::*get)(std::string&) const;
-    const char* tracedAs;  ///< null: not traced
-};
-
-/// A property of the instance; `set` asks the element and sets what it answers.
-template <typename Element>
-struct ElementProperty {
-    const char* name;
-    void (*set)(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
-                const Element& element);
-};
-
-// Rows of the property tables. The type of a property is that of its getter's
-// output; each getter is handed a fresh value, empty, 0 or false.
-
-template <typename Getter>
-struct GetterOf;
-template <typename E, typename Output>
-struct GetterOf<bool (E::*)(Output&) const> {
-    using Element = E;
-    using Value = Output;
-};
-
-template <auto getter>
-using ElementOf = typename GetterOf<decltype(getter)>::Element;
-template <auto getter>
-using ValueOf = typename GetterOf<decltype(getter)>::Value;
-
-/// A property that is set when its getter succeeds.
-template <auto getter>
-constexpr ElementProperty<ElementOf<getter>> property(const char* propertyName) {
-    return {propertyName, [](const CMPIBroker* broker, CMPIInstance* instance, const char* name,
-                             const ElementOf<getter>& element) {
-                ValueOf<getter> value{};
-                if (!(element.*getter)(value)) {
-                    return;
-                }
-                if constexpr (requires { typename ValueOf<getter>::value_type; } &&
-                              !std::is_same_v<ValueOf<getter>, std::string>) {
-                    ProviderUtilities::setProperty(broker, instance, name, value);
-                } else {
-                    ProviderUtilities::setProperty(instance, name, value);
-                }
-            }};
-}
-
-/// A property of type datetime.
-template <auto getter>
-constexpr ElementProperty<ElementOf<getter>> dateTime(const char* propertyName) {
-    return {propertyName, [](const CMPIBroker* broker, CMPIInstance* instance, const char* name,
-                             const ElementOf<getter>& element) {
-                std::string value;
-                if ((element.*getter)(value)) {
-                    ProviderUtilities::setProperty(broker, instance, name, value, true);
-                }
-            }};
-}
-
-/// A text property that is not set when it is empty.
-template <auto getter>
-constexpr ElementProperty<ElementOf<getter>> nonEmptyText(const char* propertyName) {
-    return {propertyName, [](const CMPIBroker* /*broker*/, CMPIInstance* instance, const char* name,
-                             const ElementOf<getter>& element) {
-                std::string value;
-                if ((element.*getter)(value) && !value.empty()) {
-                    ProviderUtilities::setProperty(instance, name, value);
-                }
-            }};
-}
-
-/// Turns the path's keys into filters. A path without keys, or none at all,
-/// leaves the element as it is, and so does each key that the path lacks.
-template <typename Element, std::size_t count>
-void filterByKeys(Element& element, const CMPIObjectPath* objectPath,
-                  const std::array<FilterKey<Element>, count>& keys, const TracePoint& at) {
-    if (static_cast<unsigned short>(ProviderUtilities::getKeyCount(objectPath)) == 0) {
-        return;
-    }
-    for (const FilterKey<Element>& key : keys) {
-        std::string value;
-        if (!ProviderUtilities::getKeyProperty(objectPath, key.name, value)) {
-            continue;
-        }
-        if (key.traced) {
-            traceVariable(at, key.name, value);
-        }
-        element.setFilter(key.type, value);
-    }
-}
-
-/// Makes the object path of the element's present record; null when it stands on
-/// none, or the broker makes none. The path belongs to the broker.
-template <typename Element, std::size_t count>
-CMPIObjectPath* makeObjectPath(const CMPIBroker* broker, const char* className,
-                               const std::string& nameSpace, const Element& element,
-                               const std::array<PathKey<Element>, count>& keys,
-                               const TracePoint& at) {
-    CMPIObjectPath* path = element.isOnRecord()
-                               ? ProviderUtilities::createObjectPath(broker, className, nameSpace)
-                               : nullptr;
-    if (path == nullptr) {
-        return nullptr;
-    }
-    for (const PathKey<Element>& key : keys) {
-        std::string value;
-        if (!(element.*key.get)(value)) {
-            continue;
-        }
-        if (key.tracedAs != nullptr) {
-            traceVariable(at, key.tracedAs, value);
-        }
-        ProviderUtilities::setKeyProperty(path, key.name, value);
-    }
-    return path;
-}
-
-/// Makes the instance of a path and sets all that the element can tell; null when
-/// the broker makes none. The instance belongs to the broker.
-template <typename Element, std::size_t count>
-CMPIInstance* makeInstance(const CMPIBroker* broker, const CMPIObjectPath* path,
-                           const Element& element,
-                           const std::array<ElementProperty<Element>, count>& properties) {
-    CMPIInstance* instance = ProviderUtilities::createInstance(broker, path);
-    if (instance != nullptr) {
-        for (const ElementProperty<Element>& property : properties) {
-            property.set(broker, instance, property.name, element);
-        }
-    }
-    return instance;
-}
 
 }  // namespace ZR::DHCPClientProvider

@@ -8,20 +8,11 @@ using NodeLexicon::Properties;
 std::optional<std::string> findKey(Moniker& moniker, const char* name, Occurrence occurrence,
                                    const TracePoint& at) {
     std::optional<std::string> found;
-    const std::size_t count = moniker.getKeyCount();
-    for (std::size_t i = 0; i < count; ++i) {
-        std::string keyName;
-        std::string value;
-        if (!moniker.selectKey(i) || !moniker.getName(keyName) || keyName != name ||
-            !moniker.getValue(value)) {
-            continue;
-        }
+    visitKeys(moniker, name, [&](std::size_t, std::string&& value) {
         traceVariable(at, name, value);
         found = std::move(value);
-        if (occurrence == Occurrence::first) {
-            break;
-        }
-    }
+        return occurrence == Occurrence::first;
+    });
     return found;
 }
 
@@ -43,16 +34,16 @@ Moniker monikerOf(const char* name, const std::string& value) {
 Moniker findSystemMoniker(Instrumentation& cursor, Moniker& known, const TracePoint& at) {
     const std::string systemName =
         requireKey(known, "SystemName", "Could not find 'System Name' Key in Moniker", at);
-    for (cursor.selectNode(NodeType::ComputerSystem); cursor; ++cursor) {
-        std::string name;
-        if (!cursor.getProperty(Properties::Name, name)) {
-            throw InstrumentationException("Name Property on computer not available.");
-        }
-        if (name == systemName) {
-            return monikerOf("Name", name);
-        }
+    std::string name;
+    if (!walkTo(cursor, NodeType::ComputerSystem, [&](const auto& computer) {
+            if (!computer.getProperty(Properties::Name, name)) {
+                throw InstrumentationException("Name Property on computer not available.");
+            }
+            return name == systemName;
+        })) {
+        throw InstrumentationException("Concerned Computer Could Not Be Found.");
     }
-    throw InstrumentationException("Concerned Computer Could Not Be Found.");
+    return monikerOf("Name", name);
 }
 
 std::string interfaceOfAccessPoint(const std::string& accessPointName, const TracePoint& at) {

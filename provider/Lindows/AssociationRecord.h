@@ -2,6 +2,7 @@
 
 #include <optional>
 #include <string>
+#include <utility>
 
 #include "include/Exceptions.h"
 #include "include/TracePoint.h"
@@ -18,10 +19,25 @@
 /// Builders move the record's cursor: one record is used by one request.
 namespace ZR::DHCPClientProvider {
 
+/// Shows every key of that name to `visit(position, value)`, until it answers true.
+/// Names compare exactly.
+template <typename Visit>
+void visitKeys(Moniker& moniker, const char* name, const Visit& visit) {
+    const std::size_t count = moniker.getKeyCount();
+    for (std::size_t position = 0; position < count; ++position) {
+        std::string keyName;
+        std::string value;
+        if (moniker.selectKey(position) && moniker.getName(keyName) && keyName == name &&
+            moniker.getValue(value) && visit(position, std::move(value))) {
+            return;
+        }
+    }
+}
+
 /// Which of several keys of one name counts.
 enum class Occurrence { first, last };
 
-/// The value of a key, traced under the key's name. Names compare exactly.
+/// The value of a key. Each that is read is traced under the key's name.
 std::optional<std::string> findKey(Moniker& moniker, const char* name, Occurrence occurrence,
                                    const TracePoint& at);
 
@@ -33,7 +49,8 @@ std::string requireKey(Moniker& moniker, const char* name, const char* message,
 /// A moniker with one key.
 Moniker monikerOf(const char* name, const std::string& value);
 
-/// Walks an element iterator to the first element that `matches`; false when it runs out.
+/// Walks an element iterator or a cursor to the first element that `matches`; false
+/// when it runs out.
 template <typename Element, typename Matches>
 bool walkTo(Element& element, const Matches& matches) {
     for (; element; ++element) {
@@ -42,6 +59,13 @@ bool walkTo(Element& element, const Matches& matches) {
         }
     }
     return false;
+}
+
+/// Walks a cursor over all nodes of a type in the same way.
+template <typename Matches>
+bool walkTo(Instrumentation& cursor, NodeLexicon::NodeType type, const Matches& matches) {
+    cursor.selectNode(type);
+    return walkTo(cursor, matches);
 }
 
 /// Whether a text getter of an element succeeds with this value.

@@ -31,15 +31,15 @@ Moniker DHCPOrderedComponent::getGroupComponentMoniker(Moniker& dhcpDataMoniker)
         requireKey(dhcpDataMoniker, "InstanceID", "Could not find 'InstanceID' property", ZR_HERE);
     std::vector<std::string> pieces;
     stringTokenize(instanceId, pieces, "%");
-    Instrumentation& cursor = *this;
-    for (cursor.selectNode(NodeType::NetworkInterface); cursor; ++cursor) {
-        std::string name;
-        // An InstanceID without a second piece matches no interface.
-        if (cursor.getProperty(Properties::Name, name) && pieces.size() > 1 && name == pieces[1]) {
-            return monikerOf("InstanceID", instanceId + "%dhcp");
-        }
+    if (!walkTo(*this, NodeType::NetworkInterface, [&pieces](const auto& interface) {
+            std::string name;
+            // An InstanceID without a second piece matches no interface.
+            return interface.getProperty(Properties::Name, name) && pieces.size() > 1 &&
+                   name == pieces[1];
+        })) {
+        throw FrameworkException("Could not get 'Instance ID' key");
     }
-    throw FrameworkException("Could not get 'Instance ID' key");
+    return monikerOf("InstanceID", instanceId + "%dhcp");
 }
 
 Moniker DHCPOrderedComponent::getPartComponentMoniker(Moniker& ipSettingDataMoniker) {

@@ -61,26 +61,25 @@ Moniker DHCPRemoteAccessAvailableToElement::getDHCPProtocolEndpointMoniker(
         throw FrameworkException(noNameKey);
     }
     const std::string nameKey = interfaceOfAccessPoint(*name, at);
-    Instrumentation& cursor = *this;
-    for (cursor.selectNode(NodeType::NetworkInterface); cursor; ++cursor) {
-        std::string interfaceName;
-        std::vector<std::string> servers;
-        if (!cursor.getProperty(Properties::Name, interfaceName) || interfaceName != nameKey ||
-            !cursor.getProperty(Properties::DHCPServerAddresses, servers)) {
-            continue;
-        }
-        if (servers.size() > 1) {
-            orderOfAccess_ = 0;
-        }
-        Moniker endpoint;
-        endpoint.addKey("Name", nameKey);
-        endpoint.addKey("SystemName", systemName);
-        endpoint.addKey("SystemCreationClassName", systemClass);
-        endpoint.addKey("CreationClassName", "QVXZR_DHCPProtocolEndpoint");
-        return endpoint;
+    std::vector<std::string> servers;
+    if (!walkTo(*this, NodeType::NetworkInterface, [&](const auto& interface) {
+            std::string interfaceName;
+            return interface.getProperty(Properties::Name, interfaceName) &&
+                   interfaceName == nameKey &&
+                   interface.getProperty(Properties::DHCPServerAddresses, servers);
+        })) {
+        // It is a DHCP endpoint that is missing; clients know the text.
+        throw InstrumentationException("Concerned IP Protocol Endpoint Could Not Be Found.");
     }
-    // It is a DHCP endpoint that is missing; clients know the text.
-    throw InstrumentationException("Concerned IP Protocol Endpoint Could Not Be Found.");
+    if (servers.size() > 1) {
+        orderOfAccess_ = 0;
+    }
+    Moniker endpoint;
+    endpoint.addKey("Name", nameKey);
+    endpoint.addKey("SystemName", systemName);
+    endpoint.addKey("SystemCreationClassName", systemClass);
+    endpoint.addKey("CreationClassName", "QVXZR_DHCPProtocolEndpoint");
+    return endpoint;
 }
 
 bool DHCPRemoteAccessAvailableToElement::getOrderOfAccess(unsigned short& order) const {

@@ -46,7 +46,7 @@ class DHCPSettingData {
     bool getConfigurationName(std::string& value) const;
     /// Writes the configuration name into the interface's file, if there is one.
     /// Always true, whatever happened.
-    bool setConfigurationName(const std::string& value) const;
+    [[nodiscard]] bool setConfigurationName(const std::string& value) const;
     bool getAddressOrigin(unsigned short& value) const;
     bool getRequestedIPv4Address(std::string& value) const;
 

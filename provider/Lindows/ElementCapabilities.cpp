@@ -28,30 +28,27 @@ Moniker ElementCapabilities::getDHCPCapabilitiesMoniker(Moniker& monikerDHCPEndp
     const ParameterScope scope(ZR_HERE, " monikerDHCPEndpoint=", &monikerDHCPEndpoint);
     const std::string endpointName =
         requireKey(monikerDHCPEndpoint, "Name", "Could not find 'Name' Key in Moniker", ZR_HERE);
+    // No match is no failure: the name is then that of the last interface.
     std::string name;
-    Instrumentation& cursor = *this;
-    for (cursor.selectNode(NodeType::NetworkInterface); cursor; ++cursor) {
-        if (!cursor.getProperty(Properties::Name, name)) {
+    walkTo(*this, NodeType::NetworkInterface, [&](const auto& interface) {
+        if (!interface.getProperty(Properties::Name, name)) {
             throw InstrumentationException("Name Property on NetworkIPConfig Node not available.");
         }
-        if (name == endpointName) {
-            break;
-        }
-    }
+        return name == endpointName;
+    });
     return monikerOf("InstanceID", name);
 }
 
 Moniker ElementCapabilities::getDHCPEndpointMoniker(Moniker& monikerCapabilities) {
     const ParameterScope scope(ZR_HERE, " monikerCapabilities=", &monikerCapabilities);
-    std::string keyName;
-    std::string instanceId;
     const auto count = static_cast<unsigned>(monikerCapabilities.getKeyCount());
-    unsigned keyId = 0;
-    while (keyId < count &&
-           !(monikerCapabilities.selectKey(keyId) && monikerCapabilities.getName(keyName) &&
-             keyName == "InstanceID" && monikerCapabilities.getValue(instanceId))) {
-        ++keyId;
-    }
+    unsigned keyId = count;
+    std::string instanceId;
+    visitKeys(monikerCapabilities, "InstanceID", [&](std::size_t position, std::string&& value) {
+        keyId = static_cast<unsigned>(position);
+        instanceId = std::move(value);
+        return true;
+    });
     traceVariable(ZR_HERE, "InstanceID", instanceId);
     traceVariable(ZR_HERE, "KeyID", keyId);
     traceVariable(ZR_HERE, "count", count);

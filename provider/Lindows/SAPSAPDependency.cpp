@@ -1,7 +1,5 @@
 #include "Lindows/SAPSAPDependency.h"
 
-#include <array>
-
 #include "Lindows/AssociationRecord.h"
 #include "Lindows/DHCPProtocolEndpoint.h"
 
@@ -12,10 +10,6 @@ const std::string loggerSAPSAPDependency = loggerCategory;
 namespace {
 
 const TraceSource source{"Lindows/SAPSAPDependency", loggerSAPSAPDependency};
-
-/// AddressOrigin (CIM 2.41) by address source: unknown, DHCP, BOOTP, static, IPv4
-/// link local, other.
-constexpr std::array<unsigned short, 6> addressOrigins{0, 4, 5, 3, 6, 1};
 
 struct Keys {
     std::string name;
@@ -73,7 +67,7 @@ bool SAPSAPDependency::getAddressOrigin(unsigned short& origin) const {
     unsigned int addressSource = 0;
     getProperty(NodeLexicon::Properties::AddressSource, addressSource);
     traceVariable(ZR_HERE, "IPOrigin in IP Protocol", addressSource);
-    origin = addressSource < addressOrigins.size() ? addressOrigins[addressSource] : 0;
+    origin = NodeLexicon::addressOriginOf(addressSource);
     return true;
 }
 

@@ -3,8 +3,10 @@
 #include <algorithm>
 #include <array>
 #include <charconv>
+#include <concepts>
 #include <cstring>
 #include <string_view>
+#include <utility>
 
 #include "include/TracePoint.h"
 
@@ -17,39 +19,38 @@ namespace {
 struct Format {
     std::array<std::string_view, 5> literals;
     std::size_t arguments = 0;
+    std::size_t literalSize = 0;
 
     consteval explicit Format(std::string_view text) {
         for (std::size_t at = text.find('%'); at != std::string_view::npos; at = text.find('%')) {
             literals[arguments++] = text.substr(0, at);
+            literalSize += at;
             text.remove_prefix(at + 2);
         }
         literals[arguments] = text;
+        literalSize += text.size();
     }
 };
 
-constexpr std::array plainFormats{
-    Format("ENTERING: %s() in %s [Line: %d]"),
-    Format("EXITING: %s() in %s [Line: %d]"),
-    Format("METHOD: %s() was invoked in %s [Line: %d]"),
-    Format("MESSAGE [File: %s, Line: %d]: %s"),
-};
+constexpr Format enteringPlain("ENTERING: %s() in %s [Line: %d]");
+constexpr Format exitingPlain("EXITING: %s() in %s [Line: %d]");
+constexpr Format methodPlain("METHOD: %s() was invoked in %s [Line: %d]");
+constexpr Format messagePlain("MESSAGE [File: %s, Line: %d]: %s");
 
-constexpr std::array parameterFormats{
-    Format("ENTERING: %s() in %s [Line: %d],Parameters List: %s"),
-    Format("EXITING: %s() in %s [Line: %d],Parameters List: %s"),
-    Format("METHOD: %s() was invoked in %s [Line: %d],Parameters List: %s"),
-    Format("MESSAGE [File: %s, Line: %d]: %s,Parameters List: %s"),
-};
+constexpr Format enteringParameters("ENTERING: %s() in %s [Line: %d],Parameters List: %s");
+constexpr Format exitingParameters("EXITING: %s() in %s [Line: %d],Parameters List: %s");
+constexpr Format methodParameters("METHOD: %s() was invoked in %s [Line: %d],Parameters List: %s");
+constexpr Format messageParameters("MESSAGE [File: %s, Line: %d]: %s,Parameters List: %s");
 
 constexpr Format textVariable("VARIABLE: '%s' has Value '%s' at line %d in %s");
 constexpr Format numberVariable("VARIABLE: '%s' has Value '%d' at line %d in %s");
 
 /// The argument of one conversion: %s takes a text, %d a number.
 struct Argument {
-    // Implicit, so that a line reads like its format; the digits are written as needed.
+    // The digits are written as needed.
     // NOLINTBEGIN(cppcoreguidelines-pro-type-member-init)
-    Argument(std::string_view argument) : text(argument) {}
-    Argument(unsigned argument) {
+    explicit Argument(std::string_view argument) : text(argument) {}
+    explicit Argument(unsigned argument) {
         const auto* end =
             std::to_chars(digits.data(), digits.data() + digits.size(), static_cast<int>(argument))
                 .ptr;
@@ -102,20 +103,50 @@ struct Buffer {
     }
 };
 
-/// Formats into the buffer, up to its last byte, which stays zero.
+/// Formats a text that fits. Literals have sizes known to the compiler here, which
+/// turns the copying of each into a few moves.
+template <const Format& format, std::size_t... index, typename... Arguments>
+void formatWhole(char* out, std::index_sequence<index...> /*all*/, const Arguments&... arguments) {
+    const auto putLiteral = [&out]<std::size_t at>() {
+        constexpr std::string_view literal = format.literals[at];
+        std::memcpy(out, literal.data(), literal.size());
+        out += literal.size();
+    };
+    const auto putArgument = [&out](const Argument& argument) {
+        copyShort(out, argument.text.data(), argument.text.size());
+        out += argument.text.size();
+    };
+    ((putLiteral.template operator()<index>(), putArgument(arguments)), ...);
+    putLiteral.template operator()<sizeof...(index)>();
+}
+
+/// Formats what of the text fits into the buffer; answers the size.
 template <std::size_t count>
-std::string_view format(Buffer& buffer, const Format& format, const Argument (&arguments)[count]) {
+std::size_t formatCut(Buffer& buffer, const Format& format,
+                      const std::array<std::string_view, count>& arguments) {
     std::size_t size = 0;
     const auto put = [&size, &buffer](std::string_view piece) {
-        const std::size_t fits = std::min(piece.size(), buffer.text.size() - 1 - size);
-        copyShort(buffer.text.data() + size, piece.data(), fits);
-        size += fits;
+        size += piece.copy(buffer.text.data() + size, buffer.text.size() - 1 - size);
     };
     for (std::size_t i = 0; i < count; ++i) {
         put(format.literals[i]);
-        put(arguments[i].text);
+        put(arguments[i]);
     }
     put(format.literals[count]);
+    return size;
+}
+
+/// Formats into the buffer, up to its last byte, which stays zero. Never inlined:
+/// in a shared library the address of a thread's buffer takes a call, and the
+/// compiler would make that call for every piece.
+template <const Format& format, std::same_as<Argument>... Arguments>
+[[gnu::noinline]] std::string_view formatAll(Buffer& buffer, const Arguments&... arguments) {
+    static_assert(sizeof...(arguments) == format.arguments);
+    const std::size_t size = format.literalSize + (arguments.text.size() + ...);
+    if (size >= buffer.text.size()) {
+        return buffer.keep(formatCut<sizeof...(arguments)>(buffer, format, {arguments.text...}));
+    }
+    formatWhole<format>(buffer.text.data(), std::index_sequence_for<Arguments...>(), arguments...);
     return buffer.keep(size);
 }
 
@@ -136,37 +167,56 @@ namespace TraceText {
 std::string_view variable(std::string_view name, std::string_view file, unsigned line,
                           std::string_view value) {
     static thread_local Buffer buffer{};
-    return format(buffer, textVariable, {name, value, line, file});
+    return formatAll<textVariable>(buffer, Argument(name), Argument(value), Argument(line),
+                                   Argument(file));
 }
 
 std::string_view variable(std::string_view name, std::string_view file, unsigned line,
                           unsigned value) {
     static thread_local Buffer buffer{};
-    return format(buffer, numberVariable, {name, value, line, file});
+    return formatAll<numberVariable>(buffer, Argument(name), Argument(value), Argument(line),
+                                     Argument(file));
 }
 
 std::string_view plain(std::string_view file, std::string_view function, unsigned line,
                        MessageType type) {
     static thread_local Buffer buffer{};
-    if (type > message) {
-        return formatNothing(buffer);
+    const Argument where(file);
+    const Argument what(function);
+    const Argument at(line);
+    switch (type) {
+        case entering:
+            return formatAll<enteringPlain>(buffer, what, where, at);
+        case exiting:
+            return formatAll<exitingPlain>(buffer, what, where, at);
+        case method:
+            return formatAll<methodPlain>(buffer, what, where, at);
+        case message:
+            return formatAll<messagePlain>(buffer, where, at, what);
+        default:
+            return formatNothing(buffer);
     }
-    if (type == message) {
-        return format(buffer, plainFormats[type], {file, line, function});
-    }
-    return format(buffer, plainFormats[type], {function, file, line});
 }
 
 std::string_view withParameters(std::string_view file, std::string_view function, unsigned line,
                                 std::string_view parameters, MessageType type) {
     static thread_local Buffer buffer{};
-    if (type > message) {
-        return formatNothing(buffer);
+    const Argument where(file);
+    const Argument what(function);
+    const Argument at(line);
+    const Argument with(parameters);
+    switch (type) {
+        case entering:
+            return formatAll<enteringParameters>(buffer, what, where, at, with);
+        case exiting:
+            return formatAll<exitingParameters>(buffer, what, where, at, with);
+        case method:
+            return formatAll<methodParameters>(buffer, what, where, at, with);
+        case message:
+            return formatAll<messageParameters>(buffer, where, at, what, with);
+        default:
+            return formatNothing(buffer);
     }
-    if (type == message) {
-        return format(buffer, parameterFormats[type], {file, line, function, parameters});
-    }
-    return format(buffer, parameterFormats[type], {function, file, line, parameters});
 }
 
 }  // namespace TraceText

@@ -34,6 +34,26 @@ struct TracePoint {
 /// This function and line of the file whose TraceSource is called `source`.
 #define ZR_HERE (::ZR::TracePoint{source, {__func__, sizeof(__func__) - 1}, __LINE__})
 
+/// The trace points of one of several classes whose functions are written once for
+/// all. They tell the class's own source file, and of it the line where its row
+/// stands; which function it is, the name tells.
+struct RowSource {
+    TraceSource source;
+    std::string_view destructorName;  ///< "~" and the name of the class, a literal
+    unsigned line;
+
+    [[nodiscard]] TracePoint at(std::string_view function) const {
+        return {source, function, line};
+    }
+    /// With the name of the function that says `at(__func__)`.
+    template <std::size_t size>
+    [[nodiscard]] TracePoint at(const char (&function)[size]) const {
+        return at({function, size - 1});
+    }
+    [[nodiscard]] TracePoint constructor() const { return at(destructorName.substr(1)); }
+    [[nodiscard]] TracePoint destructor() const { return at(destructorName); }
+};
+
 /// Hands a line to both roads of the logging service. The text is formatted anew
 /// for the second, since the first may have traced on its own.
 template <typename Text>

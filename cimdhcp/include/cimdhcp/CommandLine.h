@@ -33,6 +33,11 @@ struct RenameCommand {
 
     bool operator==(const RenameCommand&) const = default;
 };
+struct GraphCommand {
+    bool svg = false;  ///< draw it
+
+    bool operator==(const GraphCommand&) const = default;
+};
 struct TreeCommand {
     bool operator==(const TreeCommand&) const = default;
 };
@@ -79,9 +84,9 @@ struct ReferencesCommand {
     bool operator==(const ReferencesCommand&) const = default;
 };
 
-using Command = std::variant<ShowCommand, RenameCommand, TreeCommand, ClassesCommand, NamesCommand,
-                             InstancesCommand, GetCommand, ModifyCommand, AssociatorsCommand,
-                             ReferencesCommand>;
+using Command = std::variant<ShowCommand, RenameCommand, GraphCommand, TreeCommand, ClassesCommand,
+                             NamesCommand, InstancesCommand, GetCommand, ModifyCommand,
+                             AssociatorsCommand, ReferencesCommand>;
 
 struct CommandLine {
     Options options;

@@ -122,8 +122,11 @@ bool ProviderUtilities::areClassesRelated(const CMPIBroker* broker, const std::s
     if (broker == nullptr || parent == nullptr) {
         return false;
     }
-    return classIsA(broker, nameSpace, className, parent) ||
-           classIsA(broker, nameSpace, parent, className);
+    if (classIsA(broker, nameSpace, className, parent)) {
+        return true;
+    }
+    // NOLINTNEXTLINE(readability-suspicious-call-argument): either may be the ancestor
+    return classIsA(broker, nameSpace, parent, className);
 }
 
 std::string ProviderUtilities::getNamespace(const CMPIObjectPath* path) {

@@ -1,6 +1,7 @@
 #include "zrcommon/Strings.h"
 
 #include <algorithm>
+#include <bit>
 #include <cstdint>
 
 namespace ZR {
@@ -102,7 +103,7 @@ std::string make_string(std::wstring_view text) {
     std::string narrow;
     narrow.reserve(text.size());
     for (const wchar_t unit : text) {
-        const auto codePoint = static_cast<std::uint32_t>(unit);
+        const auto codePoint = std::bit_cast<std::uint32_t>(unit);
         if (codePoint >= escapeBase + 0x80 && codePoint <= escapeBase + 0xFF) {
             narrow.push_back(static_cast<char>(codePoint - escapeBase));
         } else {

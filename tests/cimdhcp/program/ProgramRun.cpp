@@ -5,6 +5,7 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <cstdlib>
@@ -26,12 +27,16 @@ ZR::UniqueFd openOrThrow(const std::string& path, int flags) {
     return fd;
 }
 
-/// The test's environment without what would change the program's answers.
+/// The test's environment without what would change the program's answers, and with
+/// the variables of one run, which replace those of the same name.
 std::vector<std::string> environmentOf(const Environment& extra) {
     std::vector<std::string> result;
     for (char** entry = ::environ; *entry != nullptr; ++entry) {
         const std::string_view text = *entry;
-        if (!text.starts_with("ZR_") && !text.starts_with("CIMDHCP_") &&
+        const bool replaced = std::any_of(extra.begin(), extra.end(), [text](const auto& each) {
+            return text.starts_with(each.first + '=');
+        });
+        if (!replaced && !text.starts_with("ZR_") && !text.starts_with("CIMDHCP_") &&
             !text.starts_with("COLUMNS=")) {
             result.emplace_back(text);
         }

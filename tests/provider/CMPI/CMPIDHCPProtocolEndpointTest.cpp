@@ -11,6 +11,7 @@ namespace {
 
 using test::dhcpInterface;
 using test::Fault;
+using test::Function;
 using test::host;
 using test::Host;
 using test::keyOf;
@@ -27,7 +28,7 @@ constexpr const char* className = "QVXZR_DHCPProtocolEndpoint";
 
 class CMPIDHCPProtocolEndpointTest : public test::TreeTest {
   protected:
-    Host host_;
+    Host host_{Host::Neighbours::absent, Host::Calls::counted};
 };
 
 std::vector<std::string> propertyNames(const cimom::Instance& instance) {
@@ -182,11 +183,11 @@ TEST_F(CMPIDHCPProtocolEndpointTest, NullFromTheBrokerGivesNull) {
     setTree({host({dhcpInterface("eth0")})});
     const cimom::broker::RequestScope scope;
     ZR::DHCPClientProvider::CMPIDHCPProtocolEndpoint adapter(host_.broker(), nullptr, "root/cimv2");
-    host_.failNewObjectPath(1, Fault::null);
+    host_.counted().fail(Function::newObjectPath, 1, Fault::null);
     EXPECT_EQ(adapter.getObjectPath(), nullptr);
-    host_.failNewObjectPath(1, Fault::status);
+    host_.counted().fail(Function::newObjectPath, 1, Fault::status);
     EXPECT_EQ(adapter.getCMPIInstance(nullptr), nullptr);
-    host_.failNewInstance(1, Fault::null);
+    host_.counted().fail(Function::newInstance, 1, Fault::null);
     EXPECT_EQ(adapter.getCMPIInstance(nullptr), nullptr);
 }
 

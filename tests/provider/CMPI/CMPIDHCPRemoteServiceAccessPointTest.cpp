@@ -3,6 +3,9 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <array>
+
+#include "CMPI/ElementTables.h"
 #include "CMPI/Host.h"
 #include "Tree.h"
 
@@ -72,6 +75,31 @@ TEST_F(CMPIDHCPRemoteServiceAccessPointTest, SystemNameOfAnotherComputerSelectsN
 
 TEST_F(CMPIDHCPRemoteServiceAccessPointTest, NoServersGiveNothing) {
     setTree({host({dhcpInterface("eth0"), test::interface("eth1")})});
+    EXPECT_THAT(host_.enumerate(pathOf(className)).instances, IsEmpty());
+}
+
+TEST_F(CMPIDHCPRemoteServiceAccessPointTest, ServerWhoseAddressCannotBeReadHasNoAccessInfo) {
+    setTree({host({dhcpInterface("eth0")})});
+    const cimom::broker::RequestScope scope;
+    // As the adapter fills its instance, from an access point without an address.
+    using Element = ZR::DHCPClientProvider::DHCPRemoteServiceAccessPoint;
+    const std::array properties{
+        ZR::DHCPClientProvider::property<&Element::getElementName>("ElementName"),
+        ZR::DHCPClientProvider::property<&Element::getAccessInfo>("AccessInfo")};
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    const CMPIObjectPath* path =
+        host_.broker()->eft->newObjectPath(host_.broker(), "root/cimv2", className, &status);
+    const CMPIInstance* instance =
+        ZR::DHCPClientProvider::makeInstance<Element>(host_.broker(), path, Element(), properties);
+    ASSERT_NE(instance, nullptr);
+    EXPECT_EQ(instance->ft->getPropertyCount(instance, &status), 1U);
+    instance->ft->getProperty(instance, "AccessInfo", &status);
+    EXPECT_EQ(status.rc, CMPI_RC_ERR_NO_SUCH_PROPERTY);
+}
+
+TEST_F(CMPIDHCPRemoteServiceAccessPointTest, InterfaceWhoseServersCannotBeReadHasNoAccessPoint) {
+    setTree({R"({"type": "NetworkInterface", "properties": {
+        "Name": "eth0", "DHCPServerAddresses": ["192.0.2.1", 2]}})"});
     EXPECT_THAT(host_.enumerate(pathOf(className)).instances, IsEmpty());
 }
 

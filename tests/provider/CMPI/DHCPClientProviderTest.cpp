@@ -11,6 +11,7 @@ namespace {
 
 using test::dhcpInterface;
 using test::Fault;
+using test::Function;
 using test::host;
 using test::Host;
 using test::keysOf;
@@ -35,7 +36,7 @@ class DHCPClientProviderTest : public test::TreeTest {
         return ids;
     }
 
-    Host host_;
+    Host host_{Host::Neighbours::absent, Host::Calls::counted};
 };
 
 // The function tables and factories.
@@ -97,7 +98,7 @@ TEST_F(DHCPClientProviderTest, CleanupAnswersOkWhetherTerminatingOrNotAndTracesN
 
 TEST_F(DHCPClientProviderTest, ServedClassNameGivesItsIdentifierWithoutAskingTheBroker) {
     EXPECT_THAT(identifiers(settingClass), ElementsAre(85));
-    EXPECT_EQ(host_.classQuestions(), 0U);
+    EXPECT_EQ(host_.counted().calls(Function::classPathIsA), 0U);
 }
 
 TEST_F(DHCPClientProviderTest, StandardAssociationClassesGiveTheServedOnesUnderThem) {
@@ -303,7 +304,7 @@ TEST_F(DHCPClientProviderTest, ModifyTracesThePathAsText) {
 TEST_F(DHCPClientProviderTest, ExceptionHalfWayLeavesWhatWasDeliveredAndTheStatusOk) {
     setTree({host({dhcpInterface("eth0"), dhcpInterface("eth1"), dhcpInterface("eth2")})});
     const LogCapture log(6000, 6000);
-    host_.failNewObjectPath(2, Fault::exception);
+    host_.counted().fail(Function::newObjectPath, 2, Fault::exception);
     const Host::Answer answer = host_.enumerate(pathOf(endpointClass));
     EXPECT_EQ(answer.code, CMPI_RC_OK);
     EXPECT_FALSE(answer.hasMessage);
@@ -323,7 +324,7 @@ TEST_F(DHCPClientProviderTest, ExceptionHalfWayLeavesWhatWasDeliveredAndTheStatu
 TEST_F(DHCPClientProviderTest, ExitIsMarkedAfterAnExceptionToo) {
     setTree({host({dhcpInterface("eth0")})});
     const LogCapture log(4000);
-    host_.failNewObjectPath(1, Fault::exception);
+    host_.counted().fail(Function::newObjectPath, 1, Fault::exception);
     host_.enumerateNames(pathOf(endpointClass));
     const auto messages = log.logMessages();
     ASSERT_GE(messages.size(), 2U);
@@ -337,7 +338,7 @@ TEST_F(DHCPClientProviderTest, ObjectThatTheBrokerRefusesIsPassedOverWithOneFail
     for (const Fault fault : {Fault::null, Fault::status}) {
         setTree({host({dhcpInterface("eth0"), dhcpInterface("eth1"), dhcpInterface("eth2")})});
         const LogCapture log(6000, 6000);
-        host_.failNewInstance(2, fault);
+        host_.counted().fail(Function::newInstance, 2, fault);
         const Host::Answer answer = host_.enumerate(pathOf(endpointClass));
         EXPECT_EQ(answer.code, CMPI_RC_OK);
         ASSERT_THAT(answer.instances, SizeIs(2));

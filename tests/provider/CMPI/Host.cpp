@@ -1,59 +1,10 @@
 #include "CMPI/Host.h"
 
-#include "include/Exceptions.h"
-
 namespace test {
 
 namespace {
 
 using Kind = cimom::broker::ResultCollector::Kind;
-
-/// One function that can be made to fail.
-struct Breakable {
-    unsigned calls = 0;
-    unsigned failingCall = 0;
-    Fault fault = Fault::none;
-
-    /// Whether this call fails; throws when that is how.
-    bool failsNow(CMPIStatus* rc) {
-        ++calls;
-        if (calls != failingCall || fault == Fault::none) {
-            return false;
-        }
-        if (fault == Fault::exception) {
-            throw ZR::ProviderException("a function of the broker threw");
-        }
-        if (rc != nullptr) {
-            *rc = {fault == Fault::status ? CMPI_RC_ERR_FAILED : CMPI_RC_OK, nullptr};
-        }
-        return true;
-    }
-};
-
-// One host at a time: the tables of CMPI have no room for a state of ours.
-const CMPIBroker* real = nullptr;
-Breakable newObjectPath;
-Breakable newInstance;
-unsigned classQuestionCount = 0;
-
-CMPIObjectPath* makeObjectPath(const CMPIBroker* /*broker*/, const char* nameSpace,
-                               const char* className, CMPIStatus* rc) {
-    return newObjectPath.failsNow(rc) ? nullptr
-                                      : real->eft->newObjectPath(real, nameSpace, className, rc);
-}
-
-CMPIInstance* makeInstance(const CMPIBroker* /*broker*/, const CMPIObjectPath* path,
-                           CMPIStatus* rc) {
-    return newInstance.failsNow(rc) ? nullptr : real->eft->newInstance(real, path, rc);
-}
-
-CMPIBoolean classPathIsA(const CMPIBroker* /*broker*/, const CMPIObjectPath* path, const char* type,
-                         CMPIStatus* rc) {
-    ++classQuestionCount;
-    return real->eft->classPathIsA(real, path, type, rc);
-}
-
-CMPIBrokerEncFT breakableTable;
 
 cimom::ClassRepository loadSchema() {
     cimom::ClassRepository repository;
@@ -72,30 +23,22 @@ std::unique_ptr<cimom::ObjectManager> manageNeighbours() {
 
 }  // namespace
 
-Host::Host(Neighbours neighbours)
+Host::Host(Neighbours neighbours, Calls calls)
     : manager_(neighbours == Neighbours::served ? manageNeighbours() : nullptr),
       repository_(loadSchema()),
       schema_(repository_),
-      real_(schema_, manager_.get()),
-      record_(*real_.record()) {
-    real = real_.record();
-    newObjectPath = {};
-    newInstance = {};
-    classQuestionCount = 0;
-    breakableTable = *real->eft;
-    breakableTable.newObjectPath = &makeObjectPath;
-    breakableTable.newInstance = &makeInstance;
-    breakableTable.classPathIsA = &classPathIsA;
-    record_.eft = &breakableTable;
+      real_(schema_, manager_.get()) {
+    if (calls == Calls::counted) {
+        counted_.emplace(real_.record());
+    }
     CMPIStatus status{CMPI_RC_OK, nullptr};
-    instanceMI_ = DHCPClientProvider_Create_InstanceMI(&record_, nullptr, &status);
-    associationMI_ = DHCPClientProvider_Create_AssociationMI(&record_, nullptr, &status);
+    instanceMI_ = DHCPClientProvider_Create_InstanceMI(broker(), nullptr, &status);
+    associationMI_ = DHCPClientProvider_Create_AssociationMI(broker(), nullptr, &status);
 }
 
 Host::~Host() {
     instanceMI_->ft->cleanup(instanceMI_, nullptr, 1);
     associationMI_->ft->cleanup(associationMI_, nullptr, 1);
-    real = nullptr;
 }
 
 Host::Answer Host::enumerateNames(const cimom::ObjectPath& path) {
@@ -123,6 +66,9 @@ Host::Answer Host::modify(const cimom::ObjectPath& path, const cimom::Instance* 
                 ? nullptr
                 : cimom::broker::toRecord(cimom::broker::RequestScope::current().arena(), &schema_,
                                           *instance);
+        if (counted_) {
+            newInstanceRecord = counted_->standIn(newInstanceRecord);
+        }
         return instanceTable().modifyInstance(instanceMI_, context, result, record,
                                               newInstanceRecord, nullptr);
     });
@@ -156,18 +102,6 @@ Host::Answer Host::references(const cimom::ObjectPath& path, const char* resultC
         return associationTable().references(associationMI_, context, result, record, resultClass,
                                              nullptr, nullptr);
     });
-}
-
-void Host::failNewObjectPath(unsigned call, Fault fault) {
-    newObjectPath = {0, call, fault};
-}
-
-void Host::failNewInstance(unsigned call, Fault fault) {
-    newInstance = {0, call, fault};
-}
-
-unsigned Host::classQuestions() const {
-    return classQuestionCount;
 }
 
 cimom::ObjectPath pathOf(const std::string& className,

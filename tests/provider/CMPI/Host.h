@@ -10,6 +10,7 @@
 #include "Broker.h"
 #include "BrokerContext.h"
 #include "BrokerResult.h"
+#include "CMPI/CountedBroker.h"
 #include "Conversion.h"
 #include "DHCPClientProvider.h"
 #include "RequestScope.h"
@@ -20,18 +21,9 @@
 
 namespace test {
 
-/// What a function of the broker does in place of its work.
-enum class Fault {
-    none,
-    null,       ///< answers null, with status OK
-    status,     ///< answers null, with an error status
-    exception,  ///< throws ZR::ProviderException, as the provider's own code might
-};
-
 /// The real broker of the object manager around the provider's own function tables:
 /// requests go straight to the slots, so that a test sees what the provider did and
-/// not what an object manager makes of it. Two functions of the broker can be made
-/// to fail, at a call that the test names.
+/// not what an object manager makes of it. One at a time.
 class Host {
   public:
     struct Answer {
@@ -46,12 +38,21 @@ class Host {
     /// ends, with the neighbours' library; without, it refuses to be asked.
     enum class Neighbours { absent, served };
 
-    explicit Host(Neighbours neighbours = Neighbours::absent);
+    /// Whether the provider gets the broker itself or one that counts every call
+    /// and can let it fail.
+    enum class Calls { direct, counted };
+
+    explicit Host(Neighbours neighbours = Neighbours::absent, Calls calls = Calls::direct);
     ~Host();
     Host(const Host&) = delete;
     Host& operator=(const Host&) = delete;
 
-    [[nodiscard]] const CMPIBroker* broker() const { return &record_; }
+    /// What the provider gets.
+    [[nodiscard]] const CMPIBroker* broker() const {
+        return counted_ ? counted_->record() : real_.record();
+    }
+    /// Only of a host whose calls are counted.
+    [[nodiscard]] CountedBroker& counted() { return *counted_; }
     [[nodiscard]] const CMPIInstanceMIFT& instanceTable() const { return *instanceMI_->ft; }
     [[nodiscard]] const CMPIAssociationMIFT& associationTable() const {
         return *associationMI_->ft;
@@ -77,18 +78,17 @@ class Host {
         cimom::broker::Arena& arena = cimom::broker::RequestScope::current().arena();
         const CMPIContext* context = cimom::broker::makeContext(arena, path.nameSpace, "", 0, 1);
         const CMPIObjectPath* record = cimom::broker::toRecord(arena, &schema_, path);
-        const CMPIStatus status = call(context, collector.record(), record);
+        const CMPIResult* result = collector.record();
+        if (counted_) {
+            counted_->beginRequest();
+            record = counted_->standIn(record);
+            result = counted_->standIn(result);
+        }
+        const CMPIStatus status = call(context, result, record);
         cimom::broker::Delivery delivery = collector.take();
         return {status.rc, status.msg != nullptr, std::move(delivery.paths),
                 std::move(delivery.instances), delivery.returnDoneCalls};
     }
-
-    /// The call of newObjectPath (or newInstance) with this number, from 1, fails.
-    void failNewObjectPath(unsigned call, Fault fault);
-    void failNewInstance(unsigned call, Fault fault);
-
-    /// How often classPathIsA was asked.
-    [[nodiscard]] unsigned classQuestions() const;
 
     const cimom::ClassRepository& repository() const { return repository_; }
 
@@ -97,7 +97,7 @@ class Host {
     cimom::ClassRepository repository_;
     cimom::broker::Schema schema_;
     cimom::broker::Broker real_;
-    CMPIBroker record_;
+    std::optional<CountedBroker> counted_;
     CMPIInstanceMI* instanceMI_;
     CMPIAssociationMI* associationMI_;
 };

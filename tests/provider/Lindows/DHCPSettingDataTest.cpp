@@ -318,7 +318,7 @@ TEST_F(DHCPSettingDataTest, TracesTheFileOfTheConfigurationName) {
     const LogCapture capture;
     text(setting, &Setting::getConfigurationName);
     EXPECT_THAT(test::variables(capture.log()), ElementsAre("l_cFileName=" + fileOf("eth0")));
-    setting.setConfigurationName("new");
+    EXPECT_TRUE(setting.setConfigurationName("new"));
     EXPECT_THAT(test::variables(capture.trace()),
                 ElementsAre("l_cFileName=" + fileOf("eth0"), "l_cFileName=" + fileOf("eth0")));
 }
@@ -332,7 +332,7 @@ TEST_F(DHCPSettingDataTest, ThreadsThatRenameDifferentInterfacesLoseNothing) {
             Setting setting;
             setting.setFilter(Setting::FilterByInstanceID, "Computer%" + name);
             const std::string value = name + " " + std::to_string(count);
-            setting.setConfigurationName(value);
+            EXPECT_TRUE(setting.setConfigurationName(value));
             std::string now;
             setting.getConfigurationName(now);
             lost += now != value || readFile(fileOf(name)) != head + "CONFIG_NAME=" + value + "\n";

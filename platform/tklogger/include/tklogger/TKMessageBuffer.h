@@ -18,8 +18,8 @@ class TKMessageBuffer {
     static constexpr std::size_t inlineSize = 512;
 
     // Not initialised: only what was written is ever read.
-    TKMessageBuffer() noexcept {
-    }  // NOLINT(modernize-use-equals-default,cppcoreguidelines-pro-type-member-init)
+    // NOLINTNEXTLINE(modernize-use-equals-default,cppcoreguidelines-pro-type-member-init)
+    TKMessageBuffer() noexcept {}
 
     TKMessageBuffer& operator<<(std::string_view text) {
         if (heap_.empty() && text.size() <= inlineSize - size_) {

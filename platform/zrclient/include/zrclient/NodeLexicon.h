@@ -32,6 +32,14 @@ enum class AddressSource : unsigned int {
     Other = 5,
 };
 
+/// The value of AddressOrigin (CIM 2.41) for a value of Properties::AddressSource;
+/// 0, which is unknown, for a number that is none.
+constexpr unsigned short addressOriginOf(unsigned int addressSource) noexcept {
+    // Unknown, DHCP, BOOTP, static, IPv4 link local, other.
+    constexpr std::array<unsigned short, 6> origins{0, 4, 5, 3, 6, 1};
+    return addressSource < origins.size() ? origins[addressSource] : origins[0];
+}
+
 template <typename Number>
 struct Entry {
     Number number;

@@ -16,7 +16,8 @@ class SnapshotSource {
     virtual ~SnapshotSource() = default;
 
     /// Whether something may have changed since the last read(). Never blocks;
-    /// costs one system call while nothing changes. True before the first read.
+    /// costs one system call while nothing changes, and one more while an answer is
+    /// awaited. True before the first read.
     [[nodiscard]] virtual bool changed() = 0;
 
     /// Reads the present state. Never throws and never returns null: what cannot

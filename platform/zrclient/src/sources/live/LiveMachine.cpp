@@ -9,6 +9,7 @@
 
 #include "Clients.h"
 #include "Decide.h"
+#include "IpmiDevice.h"
 #include "tklogger/TKLogger.h"
 #include "zrclient/LiveSource.h"
 #include "zrcommon/SystemName.h"
@@ -62,6 +63,9 @@ void complainToLog(std::string_view message) {
 LiveMachine::LiveMachine(Surroundings surroundings)
     : surroundings_(std::move(surroundings)),
       reader_(std::move(surroundings_.transport)),
+      processor_(
+          surroundings_.ipmi ? std::move(surroundings_.ipmi) : ipmiDevice(surroundings_.roots),
+          surroundings_.uptime),
       places_(fixedPlaces(surroundings_.roots)) {
     if (!surroundings_.complain) {
         surroundings_.complain = complainToLog;
@@ -69,7 +73,8 @@ LiveMachine::LiveMachine(Surroundings surroundings)
 }
 
 bool LiveMachine::changed() {
-    return monitor_.changed();
+    // Being asked is what moves the talk with the service processor on.
+    return processor_.changed() || monitor_.changed();
 }
 
 std::shared_ptr<const Snapshot> LiveMachine::read() {
@@ -84,11 +89,13 @@ std::shared_ptr<const Snapshot> LiveMachine::read() {
         watchProcesses(clients);
     }
     markWireless(surroundings_.roots, network.links);
+    std::optional<ServiceProcessor> processor = processor_.read(clients.complaints);
     report(clients.complaints);
     return decide({.hostName = getSystemName(),
                    .links = std::move(network.links),
                    .addresses = std::move(network.addresses),
-                   .clients = std::move(clients)},
+                   .clients = std::move(clients),
+                   .serviceProcessor = std::move(processor)},
                   surroundings_.now(), surroundings_.explain);
 }
 

@@ -9,6 +9,7 @@
 #include <vector>
 
 #include "ChangeMonitor.h"
+#include "IpmiReader.h"
 #include "NetlinkTransport.h"
 #include "Roots.h"
 #include "RtnetlinkReader.h"
@@ -30,6 +31,9 @@ struct Surroundings {
     /// then are those of other processes.
     bool realProcesses = true;
     Explain explain = Explain::No;
+    /// The way to the service processor; null: the device of the machine at `roots`.
+    std::unique_ptr<IpmiTransport> ipmi = nullptr;
+    IpmiReader::Clock uptime = std::chrono::steady_clock::now;
     /// Takes what could not be read, or not for certain.
     std::function<void(std::string_view)> complain;
 };
@@ -50,6 +54,7 @@ class LiveMachine final : public SnapshotSource {
     Surroundings surroundings_;
     RtnetlinkReader reader_;
     ChangeMonitor monitor_;
+    IpmiReader processor_;
     std::vector<WatchedPlace> places_;
     std::vector<std::string> reported_;
 };

@@ -2,6 +2,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <optional>
 #include <span>
 #include <string>
 #include <string_view>
@@ -10,6 +11,7 @@
 #include "Address.h"
 #include "Lease.h"
 #include "Link.h"
+#include "ServiceProcessor.h"
 
 namespace ZR::Live {
 
@@ -19,6 +21,7 @@ struct MachineFacts {
     std::vector<Link> links;
     std::vector<Address> addresses;
     ClientFacts clients;
+    std::optional<ServiceProcessor> serviceProcessor = std::nullopt;
 
     bool operator==(const MachineFacts&) const = default;
 };
@@ -58,6 +61,9 @@ class Machine {
 
     [[nodiscard]] std::span<const InterfaceView> interfaces() const { return views_; }
     [[nodiscard]] const std::string& hostName() const { return facts_.hostName; }
+    [[nodiscard]] const std::optional<ServiceProcessor>& serviceProcessor() const {
+        return facts_.serviceProcessor;
+    }
     [[nodiscard]] const std::vector<std::string>& complaints() const {
         return facts_.clients.complaints;
     }

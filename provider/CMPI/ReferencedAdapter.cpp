@@ -1,4 +1,4 @@
-#include "CMPI/ReferencedClass.h"
+#include "CMPI/ReferencedAdapter.h"
 
 #include "include/Exceptions.h"
 

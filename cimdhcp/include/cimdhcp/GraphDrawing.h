@@ -1,0 +1,12 @@
+#pragma once
+
+#include <string>
+
+namespace cimdhcp {
+
+/// Draws a graph with the program "dot" of Graphviz, which is looked for along PATH.
+/// Answers the picture as SVG. Throws Failure with ExitStatus::notLoaded when the
+/// program is not installed, and when it fails; its own words are on standard error.
+[[nodiscard]] std::string drawSvg(const std::string& graphviz);
+
+}  // namespace cimdhcp
