@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <nlohmann/json.hpp>
 
+#include "cimdhcp/DisplayText.h"
 #include "cimdhcp/JsonFormat.h"
 #include "cimdhcp/Table.h"
 
@@ -68,6 +69,15 @@ std::string overviewTable(const std::vector<InterfaceOverview>& interfaces,
         std::all_of(interfaces.begin(), interfaces.end(),
                     [](const InterfaceOverview& each) { return each.dhcp == false; });
     return table.text(width) + (noneUsesDhcp ? "No interface of this machine uses DHCP.\n" : "");
+}
+
+std::string remarkLine(std::span<const std::string> remarks) {
+    std::string line;
+    for (const std::string& remark : remarks) {
+        line +=
+            (line.empty() ? "cimdhcp: not everything could be read: " : "; ") + printable(remark);
+    }
+    return line.empty() ? line : line + '\n';
 }
 
 std::string overviewJson(const std::vector<InterfaceOverview>& interfaces) {

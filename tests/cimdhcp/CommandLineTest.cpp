@@ -104,6 +104,11 @@ TEST_F(CommandLineText, TakesArgumentsThatLookLikeCommandsOrOptions) {
               Command(RenameCommand{"eth0", "\"quoted\" 'name'", false}));
 }
 
+TEST_F(CommandLineText, ATreeMayBeExplained) {
+    EXPECT_EQ(line({"tree"}).command, Command(TreeCommand{false}));
+    EXPECT_EQ(line({"tree", "--explain"}).command, Command(TreeCommand{true}));
+}
+
 TEST_F(CommandLineText, TellsWhatIsWrong) {
     const std::string hint = " (\"cimdhcp --help\" tells more)";
     EXPECT_EQ(refusal({}), "a command is missing" + hint);
