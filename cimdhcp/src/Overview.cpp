@@ -72,12 +72,18 @@ std::string overviewTable(const std::vector<InterfaceOverview>& interfaces,
 }
 
 std::string remarkLine(std::span<const std::string> remarks) {
-    std::string line;
-    for (const std::string& remark : remarks) {
-        line +=
-            (line.empty() ? "cimdhcp: not everything could be read: " : "; ") + printable(remark);
+    if (remarks.empty()) {
+        return {};
     }
-    return line.empty() ? line : line + '\n';
+    constexpr std::size_t mostTold = 4;
+    std::string line = "cimdhcp: not everything could be read: ";
+    for (const std::string& remark : remarks.first(std::min(remarks.size(), mostTold))) {
+        line += (&remark == &remarks.front() ? "" : "; ") + printable(remark);
+    }
+    if (remarks.size() > mostTold) {
+        line += "; and " + std::to_string(remarks.size() - mostTold) + " more, told in the log";
+    }
+    return line + '\n';
 }
 
 std::string overviewJson(const std::vector<InterfaceOverview>& interfaces) {

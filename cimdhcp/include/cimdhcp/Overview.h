@@ -20,7 +20,8 @@ namespace cimdhcp {
 /// "configurationName"}]}; what is not known is null.
 [[nodiscard]] std::string overviewJson(const std::vector<InterfaceOverview>& interfaces);
 
-/// One line for what could not be read of the machine; empty when there was nothing.
+/// One line for what could not be read of the machine, with the first few of many;
+/// empty when there was nothing.
 [[nodiscard]] std::string remarkLine(std::span<const std::string> remarks);
 
 }  // namespace cimdhcp
