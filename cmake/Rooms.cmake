@@ -5,6 +5,9 @@
 # their headers need, including a header of a room that is not linked does not
 # compile.
 
+# Where the headers of the platform are installed.
+set(ZR_INSTALL_INCLUDEDIR ${CMAKE_INSTALL_INCLUDEDIR}/dhcp-client-provider)
+
 set(ZR_WARNINGS
     -Wall -Wextra -Wpedantic -Werror
     -Wconversion -Wsign-conversion -Wshadow -Wnull-dereference
@@ -41,15 +44,19 @@ endif()
 function(zr_room name)
     cmake_parse_arguments(ROOM "" "" "SOURCES;LINKS;PRIVATE_LINKS" ${ARGN})
     add_library(${name} STATIC ${ROOM_SOURCES})
-    target_include_directories(${name} PUBLIC include PRIVATE src)
-    target_link_libraries(${name} PUBLIC ${ROOM_LINKS} PRIVATE zr_options ${ROOM_PRIVATE_LINKS})
+    target_include_directories(${name}
+        PUBLIC $<BUILD_INTERFACE:${CMAKE_CURRENT_SOURCE_DIR}/include>
+               $<INSTALL_INTERFACE:${ZR_INSTALL_INCLUDEDIR}>
+        PRIVATE src)
+    target_link_libraries(${name} PUBLIC ${ROOM_LINKS}
+                          PRIVATE $<BUILD_INTERFACE:zr_options> ${ROOM_PRIVATE_LINKS})
 endfunction()
 
-# zr_provider_library(NAME OBJECTS target EXPORTS symbol...)
+# zr_provider_library(NAME OBJECTS target COMPONENT component EXPORTS symbol...)
 # A CMPI provider library, made of an object library, that exports exactly the
-# symbols named.
+# symbols named, and belongs to a component of the installation.
 function(zr_provider_library name)
-    cmake_parse_arguments(LIBRARY "" "" "OBJECTS;EXPORTS" ${ARGN})
+    cmake_parse_arguments(LIBRARY "" "COMPONENT" "OBJECTS;EXPORTS" ${ARGN})
     set(map ${CMAKE_CURRENT_BINARY_DIR}/${name}.map)
     list(JOIN LIBRARY_EXPORTS "; " exports)
     file(CONFIGURE OUTPUT ${map} CONTENT "{ global: @exports@; local: *; };\n" @ONLY)
@@ -61,7 +68,8 @@ function(zr_provider_library name)
     if(NOT ZR_SANITIZERS)
         target_link_options(${name} PRIVATE -Wl,--no-undefined)
     endif()
-    install(TARGETS ${name} LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR}/cmpi)
+    install(TARGETS ${name} LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR}/cmpi
+            COMPONENT ${LIBRARY_COMPONENT})
 endfunction()
 
 # What tests are built for is to run once: optimising them costs more than it saves.

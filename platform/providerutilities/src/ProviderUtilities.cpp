@@ -315,18 +315,21 @@ bool ProviderUtilities::transformMonikerToObjectPath(Moniker& moniker, CMPIObjec
         return false;
     }
     const CMPIString* className = (*path)->ft->getClassName(*path, nullptr);
-    CMPIObjectPath* transformed =
-        className == nullptr ? nullptr
-                             : createObjectPath(lastBroker, std::string(textOf(className)).c_str(),
-                                                getNamespace(*path));
+    if (className == nullptr) {
+        return false;
+    }
+    // One after the other: as arguments, a compiler asks for them in any order.
+    const std::string name(textOf(className));
+    const std::string nameSpace = getNamespace(*path);
+    CMPIObjectPath* transformed = createObjectPath(lastBroker, name.c_str(), nameSpace);
     if (transformed == nullptr) {
         return false;
     }
     for (std::size_t i = 0; i < moniker.getKeyCount(); ++i) {
-        std::string name;
+        std::string keyName;
         std::string value;
-        if (!moniker.selectKey(i) || !moniker.getName(name) || !moniker.getValue(value) ||
-            !setKeyProperty(transformed, name.c_str(), value)) {
+        if (!moniker.selectKey(i) || !moniker.getName(keyName) || !moniker.getValue(value) ||
+            !setKeyProperty(transformed, keyName.c_str(), value)) {
             return false;
         }
     }

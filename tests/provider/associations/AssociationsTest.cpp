@@ -1,117 +1,35 @@
-// The seven associations, walked from every side on one machine: a host with three
-// DHCP interfaces, one of which has two servers, a static one, and a service processor.
+// What is particular to each of the seven associations, and how requests choose among
+// them. AssociationCellsTest walks all from every side.
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include <map>
 #include <string>
 #include <vector>
 
 #include "CMPI/Host.h"
-#include "Tree.h"
+#include "associations/Machine.h"
 #include "support/LogCapture.h"
 
 namespace {
 
-using test::dhcpInterface;
+using test::briefs;
+using test::Function;
 using test::host;
 using test::Host;
-using test::Json;
 using test::keyOf;
+using test::ofHost;
 using test::pathOf;
-using test::serviceProcessor;
 using test::staticInterface;
+using test::Texts;
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 using ::testing::SizeIs;
 using ZR::Testing::LogCapture;
 
-Json withAddress(Json node, const char* address) {
-    node["properties"]["IPv4Address"] = address;
-    return node;
-}
-
-using Texts = std::vector<std::string>;
-
-/// A path in few words: the class without its prefix, and the key that tells one
-/// object from the other. References are written in brackets, in the order of roles.
-std::string brief(const std::optional<cimom::ObjectPath>& path) {
-    if (!path) {
-        return "null";
-    }
-    std::string text = path->className.substr(path->className.find('_') + 1);
-    for (const char* role : {"Antecedent", "Dependent", "ManagedElement", "Capabilities",
-                             "SettingData", "GroupComponent", "PartComponent"}) {
-        const cimom::Value* reference = path->key(role);
-        if (reference == nullptr) {
-            continue;
-        }
-        const auto& target =
-            std::get<std::shared_ptr<const cimom::ObjectPath>>(*reference->scalar());
-        text += std::string(" ") + role + "[" + brief(*target) + "]";
-    }
-    for (const char* name : {"InstanceID", "SystemName", "Name"}) {
-        if (const auto value = keyOf(*path, name)) {
-            text += " " + *value;
-        }
-    }
-    return text;
-}
-
-Texts briefs(const Host::Answer& answer) {
-    Texts texts;
-    for (const auto& path : answer.paths) {
-        texts.push_back(brief(path));
-    }
-    for (const auto& instance : answer.instances) {
-        texts.push_back(instance ? brief(instance->path) : "null");
-    }
-    return texts;
-}
-
-class AssociationsTest : public test::TreeTest {
+class AssociationsTest : public test::MachineTest {
   protected:
-    void SetUp() override {
-        TreeTest::SetUp();
-        setTree(
-            {host({withAddress(dhcpInterface("eth0", {"192.0.2.1"}), "192.0.2.10"),
-                   withAddress(dhcpInterface("eth1", {"192.0.2.1", "2001:db8::1"}), "192.0.2.11"),
-                   withAddress(dhcpInterface("eth2"), "192.0.2.12"),
-                   withAddress(staticInterface("eth3"), "192.0.2.13")}),
-             serviceProcessor({withAddress(dhcpInterface("bmc0"), "192.0.2.20")})});
-    }
-
-    cimom::ObjectPath endpoint(const std::string& name) const {
-        return pathOf("QVXZR_DHCPProtocolEndpoint",
-                      {{"SystemCreationClassName", "QVXZR_ComputerSystem"},
-                       {"SystemName", hostName()},
-                       {"CreationClassName", "QVXZR_DHCPProtocolEndpoint"},
-                       {"Name", name}});
-    }
-
-    cimom::ObjectPath computer(const std::string& name) const {
-        return pathOf("QVXZR_ComputerSystem",
-                      {{"CreationClassName", "QVXZR_ComputerSystem"}, {"Name", name}});
-    }
-
-    std::string ofHost(const std::string& text) const {
-        std::string result = text;
-        for (std::size_t at = result.find('@'); at != std::string::npos; at = result.find('@')) {
-            result.replace(at, 1, hostName());
-        }
-        return result;
-    }
-
-    Texts ofHost(const Texts& texts) const {
-        Texts result;
-        for (const std::string& text : texts) {
-            result.push_back(ofHost(text));
-        }
-        return result;
-    }
-
-    Host host_{Host::Neighbours::served};
+    Host host_{Host::Neighbours::served, Host::Calls::counted};
 };
 
 // Hosted access point.
@@ -206,6 +124,45 @@ TEST_F(AssociationsTest, StandardParentRunsBothHostedAssociationsAndEndsOnce) {
                            "DHCPRemoteServiceAccessPoint @ eth1_IPv4",
                            "DHCPRemoteServiceAccessPoint @ eth1_IPv6"}));
     EXPECT_EQ(answer.returnDoneCalls, 1U);
+}
+
+TEST_F(AssociationsTest, StandardParentRunsTheSecondAlsoWhenTheSourceTakesNoPartInIt) {
+    const LogCapture log(4000, 6000);
+    const Host::Answer answer = host_.associatorNames(endpoint("eth0"), "CIM_HostedAccessPoint");
+    EXPECT_EQ(briefs(answer), ofHost(Texts{"ComputerSystem @"}));
+    EXPECT_EQ(answer.returnDoneCalls, 1U);
+    std::vector<std::string> adapters;
+    for (const auto& line : log.log()) {
+        if (line.function.starts_with("~") && line.file.ends_with("HostedAccessPoint") &&
+            line.file.starts_with("CMPI/")) {
+            adapters.push_back(line.file);
+        }
+    }
+    EXPECT_THAT(adapters, ElementsAre("CMPI/CMPIDHCPHostedAccessPoint",
+                                      "CMPI/CMPIDHCPRemoteHostedAccessPoint"));
+}
+
+TEST_F(AssociationsTest, RolesChangeNothing) {
+    const auto withRoles = [this](const char* role, const char* resultRole) {
+        return host_.request(cimom::broker::ResultCollector::Kind::paths, endpoint("eth0"),
+                             [&](auto* context, auto* result, auto* path) {
+                                 return host_.associationTable().associatorNames(
+                                     nullptr, context, result, path, hosted, nullptr, role,
+                                     resultRole);
+                             });
+    };
+    const auto referencesWithRole = [this](const char* role) {
+        return host_.request(cimom::broker::ResultCollector::Kind::paths, endpoint("eth0"),
+                             [&](auto* context, auto* result, auto* path) {
+                                 return host_.associationTable().referenceNames(
+                                     nullptr, context, result, path, hosted, role);
+                             });
+    };
+    for (const char* role : {"Antecedent", "Dependent", "", "NoSuchRole"}) {
+        EXPECT_EQ(briefs(withRoles(role, nullptr)), ofHost(Texts{"ComputerSystem @"})) << role;
+        EXPECT_EQ(briefs(withRoles(nullptr, role)), ofHost(Texts{"ComputerSystem @"})) << role;
+        EXPECT_THAT(briefs(referencesWithRole(role)), SizeIs(1)) << role;
+    }
 }
 
 TEST_F(AssociationsTest, UnknownAssociationClassIsAnEmptySuccessForNamesAndInvalidForInstances) {
@@ -412,6 +369,15 @@ TEST_F(AssociationsTest, EnumeratingOrderedComponentsPlacesBothEndsByTheirPaths)
     EXPECT_EQ(test::numberOf(*got.instances[0], "AssignedSequence"), 1U);
 }
 
+TEST_F(AssociationsTest, AssignmentOfASettingIsFetchedSinglyThroughTheBroker) {
+    const Host::Answer answer =
+        host_.associators(pathOf("QVXZR_DHCPSettingData", {{"InstanceID", "Computer%eth1"}}),
+                          "QVXZR_DHCPOrderedComponent");
+    EXPECT_EQ(briefs(answer), Texts{"IPAssignmentSettingData Computer%eth1%dhcp"});
+    EXPECT_EQ(host_.counted().calls(Function::getInstance), 1U);
+    EXPECT_EQ(host_.counted().calls(Function::enumerateInstances), 0U);
+}
+
 TEST_F(AssociationsTest, MissingAssignmentFailsWithTheComputersMessageAndStaysOk) {
     Host withoutNeighbours;
     const LogCapture log(6000, 6000);
@@ -453,24 +419,6 @@ TEST_F(AssociationsTest, FailureOfReferencesLeavesTheResultOpenAndIsLoggedOnceFo
     EXPECT_EQ(instances.code, CMPI_RC_OK);
     EXPECT_EQ(instances.returnDoneCalls, 0U);
     EXPECT_THAT(log.log(), SizeIs(1));
-}
-
-// A source that takes no part.
-
-TEST_F(AssociationsTest, SourceOfAnotherClassHasNoAssociations) {
-    for (const char* name :
-         {"QVXZR_HostedDHCPPoint", "QVXZR_SAPSAPDependency", "QVXZR_DHCPElementCapabilities",
-          "QVXZR_DHCPRemoteHostedAccessPoint", "QVXZR_DHCPRemoteAccessAvailableToElement",
-          "QVXZR_DHCPElementSettingData", "QVXZR_DHCPOrderedComponent"}) {
-        const auto stranger = pathOf("QVXZR_SPComputerSystem", {{"Name", "BMC:-1"}});
-        for (const Host::Answer& answer :
-             {host_.associatorNames(stranger, name), host_.associators(stranger, name),
-              host_.referenceNames(stranger, name), host_.references(stranger, name)}) {
-            EXPECT_EQ(answer.code, CMPI_RC_OK) << name;
-            EXPECT_THAT(briefs(answer), IsEmpty()) << name;
-            EXPECT_EQ(answer.returnDoneCalls, 1U) << name;
-        }
-    }
 }
 
 }  // namespace

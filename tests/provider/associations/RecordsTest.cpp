@@ -130,6 +130,24 @@ TEST_F(RecordsTest, FirstOfTwoEqualKeysCountsForTheHostedAccessPoint) {
                 ElementsAre(Pair("Name", "BMC:-1")));
 }
 
+TEST_F(RecordsTest, BuildersBeginTheirWalksAnew) {
+    setTree({host({dhcpInterface("eth0", {"192.0.2.1"})}), serviceProcessor({})});
+    DHCPHostedAccessPoint hosted;
+    ElementCapabilities capabilities;
+    DHCPOrderedComponent ordered;
+    for (int i = 0; i < 2; ++i) {
+        EXPECT_THAT(
+            build(hosted, &DHCPHostedAccessPoint::getSystemMoniker, {{"SystemName", hostName()}}),
+            ElementsAre(Pair("Name", hostName())));
+        EXPECT_THAT(build(capabilities, &ElementCapabilities::getDHCPCapabilitiesMoniker,
+                          {{"Name", "eth0"}}),
+                    ElementsAre(Pair("InstanceID", "eth0")));
+        EXPECT_THAT(build(ordered, &DHCPOrderedComponent::getGroupComponentMoniker,
+                          {{"InstanceID", "Computer%eth0"}}),
+                    ElementsAre(Pair("InstanceID", "Computer%eth0%dhcp")));
+    }
+}
+
 TEST_F(RecordsTest, BuildersTraceArgumentAndKeysAndNoExitWhenTheyThrow) {
     setTree({host({})});
     DHCPHostedAccessPoint record;

@@ -31,10 +31,10 @@ struct Surroundings {
     /// False when the process file system is one that was laid out: its numbers
     /// then are those of other processes.
     bool realProcesses = true;
-    Explain explain = Explain::No;
     /// The way to the service processor; null: the device of the machine at `roots`.
     std::unique_ptr<IpmiTransport> ipmi = nullptr;
     IpmiReader::Clock uptime = std::chrono::steady_clock::now;
+    Explain explain = Explain::No;
     /// Takes what could not be read, or not for certain.
     std::function<void(std::string_view)> complain;
 };

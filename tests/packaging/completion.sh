@@ -1,0 +1,40 @@
+#!/usr/bin/env bash
+# Completes command lines as bash would, with the real program behind.
+# Usage: completion.sh COMPLETION PROGRAM TREE
+set -euo pipefail
+
+# shellcheck source=/dev/null
+source "$1"
+export ZR_INSTRUMENTATION_TREE=$3
+program=$2
+
+failures=0
+completes() { # WANTED WORD...
+    local wanted=$1
+    shift
+    COMP_WORDS=("$program" "$@")
+    COMP_CWORD=$#
+    COMPREPLY=()
+    _cimdhcp
+    if [[ ${COMPREPLY[*]} == "$wanted" ]]; then
+        echo "ok: $*"
+    else
+        echo "FAILED: $* gives \"${COMPREPLY[*]}\", not \"$wanted\""
+        failures=$((failures + 1))
+    fi
+}
+
+completes 'show' sh
+completes 'rename references' re
+completes 'table' --format ta
+completes '--format' --fo
+completes 'QVXZR_DHCPSettingData' names QVXZR_DHCPS
+completes 'QVXZR_DHCPProtocolEndpoint' --format json instances QVXZR_DHCPP
+completes 'QVXZR_SAPSAPDependency' associators --assoc-class QVXZR_SAP
+completes 'eth0 eth1' rename eth
+completes '' rename eth0 of
+completes '--create' rename --cr
+completes '--schema-dir --svg' graph --s
+completes "$3" --tree "${3%.json}"
+completes '--registration-dir --result-class --role --result-role' associators --r
+exit $((failures > 0))

@@ -1,0 +1,95 @@
+#!/usr/bin/env bash
+# Makes the Debian packages, lets lintian read them, and installs, uses and purges them
+# in a root of their own: the machine's, with everything that is written going to a
+# file system in memory, which ends with the test.
+# Usage: packages.sh BUILD_DIRECTORY TREE
+set -euo pipefail
+
+build=$1
+tree=$2
+directory=$(mktemp -d)
+trap 'rm -rf "$directory"' EXIT
+
+(cd "$build" && cpack --config CPackConfig.cmake -B "$directory/packages") >"$directory/cpack.log" 2>&1 || {
+    cat "$directory/cpack.log"
+    exit 1
+}
+packages=("$directory"/packages/*.deb)
+echo "== packages"
+for package in "${packages[@]}"; do
+    dpkg-deb --show --showformat='${Package}: ${Description}\n' "$package" | sed -n 1p
+done
+lintian --allow-root --fail-on error --suppress-tags initial-upload-closes-no-bugs "${packages[@]}"
+
+cp "$tree" "$directory/tree.json"
+cat >"$directory/inside" <<'TEXT'
+set -euo pipefail
+cd /packages
+echo "== install"
+dpkg --install *.deb >/dev/null
+test -x /usr/bin/cimdhcp
+command -v cimdhcp
+for page in man1/cimdhcp.1 man5/zr-platform.conf.5 man8/provider-register.sh.8; do
+    test -s /usr/share/man/$page.gz
+done
+echo "== use"
+mkdir -p /var/lib/dhcp-client-provider
+printf 'DEVICE=eth0\nCONFIG_NAME=old\n' >/var/lib/dhcp-client-provider/ifcfg-eth0
+cimdhcp --tree /tree.json show
+cimdhcp --tree /tree.json --data-dir /var/lib/dhcp-client-provider rename eth0 new
+grep -x CONFIG_NAME=new /var/lib/dhcp-client-provider/ifcfg-eth0
+cimdhcp --tree /tree.json classes | tail -n +2 | wc -l
+DESTDIR=/stage /usr/share/dhcp-client-provider/provider-register.sh -t sfcb -v | grep -c written
+DESTDIR=/stage /usr/share/dhcp-client-provider/provider-register.sh -t sfcb -d
+echo "== a setting that was changed survives a new installation"
+echo LOG_LEVEL=4000 >/etc/zr/platform.conf
+dpkg --install --force-confdef cmpi-dhcp-client-provider_*.deb >/dev/null
+cat /etc/zr/platform.conf
+echo "== purge"
+dpkg --purge cimdhcp cmpi-dhcp-client-neighbours cmpi-dhcp-client-provider \
+    dhcp-client-provider-schema >/dev/null
+TEXT
+
+# dpkg's own records, and what ldconfig and the package's triggers refresh, stay.
+cat >"$directory/outside" <<'TEXT'
+set -euo pipefail
+directory=$1
+mount -t tmpfs none "$directory/memory"
+mkdir "$directory"/memory/{upper,work,root}
+mount -t overlay none -o "lowerdir=/,upperdir=$directory/memory/upper,workdir=$directory/memory/work" \
+    "$directory/memory/root"
+mkdir "$directory/memory/root/packages"
+cp "$directory"/packages/*.deb "$directory/memory/root/packages"
+cp "$directory/inside" "$directory/tree.json" "$directory/memory/root/"
+mount -t proc none "$directory/memory/root/proc"
+mount --bind /dev "$directory/memory/root/dev"
+chroot "$directory/memory/root" /bin/bash /inside
+cd "$directory/memory/upper"
+echo "== left behind"
+find . -mindepth 1 ! -type d | LC_ALL=C sort | grep -Ev \
+    '^\./(packages/|inside$|tree.json$|var/(lib/dpkg|log|cache)/|etc/ld.so.cache|usr/share/info/dir)' || true
+find . -type d \( -name '*dhcp-client*' -o -name zr \) | LC_ALL=C sort
+TEXT
+mkdir "$directory/memory"
+unshare --mount bash "$directory/outside" "$directory" >"$directory/output" 2>"$directory/errors" || {
+    cat "$directory/output" "$directory/errors"
+    exit 1
+}
+cat >"$directory/expected" <<'TEXT'
+== install
+/usr/bin/cimdhcp
+== use
+INTERFACE  DHCP  STATE   ADDRESS        SERVERS                 CONFIGURATION NAME
+eth0       on    bound   192.0.2.17     192.0.2.1, 2001:db8::1  old
+wlan0      on    bound   198.51.100.23  198.51.100.1            -
+eth1       off   active  203.0.113.4    -                       -
+eth0: the configuration name is now "new", was "old" (/var/lib/dhcp-client-provider/ifcfg-eth0).
+CONFIG_NAME=new
+15
+3
+== a setting that was changed survives a new installation
+LOG_LEVEL=4000
+== purge
+== left behind
+TEXT
+diff "$directory/expected" "$directory/output"

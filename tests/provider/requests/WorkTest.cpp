@@ -1,0 +1,212 @@
+// The work of each request, counted: nodes that cursors were placed on, and calls of
+// the broker. Counts are exact, so that work that grows faster than it must shows.
+//
+// The source of a request, where it has one, is the last of N interfaces, each of
+// which has DHCP, one server and an address.
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <cstdint>
+#include <ostream>
+#include <string>
+#include <vector>
+
+#include "Tree.h"
+#include "requests/Requests.h"
+#include "zrclient/Instrumentation.h"
+
+namespace {
+
+using test::Host;
+using test::Request;
+
+/// A count by the number N of interfaces: constant + linear N + pairs N (N - 1) / 2.
+/// Pairs come of a prescribed walk from the first interface to the Nth, for each of N.
+struct Growth {
+    std::uint64_t constant = 0;
+    std::uint64_t linear = 0;
+    std::uint64_t pairs = 0;
+
+    [[nodiscard]] std::uint64_t at(std::uint64_t n) const {
+        return constant + linear * n + pairs * (n * (n - 1) / 2);
+    }
+};
+
+struct Work {
+    const char* request;
+    Growth objects;
+    Growth visits;
+    Growth calls;
+};
+
+// An endpoint's system is two visits, its parent and the node above; the name and the
+// class of the system are asked once for a path and once more for an instance.
+const std::vector<Work> expectedWork{
+    {"namesOfDHCPProtocolEndpoint", {0, 1}, {0, 5}, {6, 10}},
+    {"instancesOfDHCPProtocolEndpoint", {0, 1}, {0, 9}, {6, 36}},
+    {"getOfDHCPProtocolEndpoint", {1}, {12, 3}, {46}},
+    {"namesOfDHCPCapabilities", {0, 1}, {0, 1}, {6, 4}},
+    {"instancesOfDHCPCapabilities", {0, 1}, {0, 1}, {6, 16}},
+    {"getOfDHCPCapabilities", {1}, {0, 1}, {24}},
+    {"namesOfDHCPSettingData", {0, 1}, {0, 3}, {5, 4}},
+    {"instancesOfDHCPSettingData", {0, 1}, {0, 5}, {5, 12}},
+    {"getOfDHCPSettingData", {1}, {4, 3}, {19}},
+    {"namesOfDHCPRemoteServiceAccessPoint", {0, 1}, {0, 3}, {5, 10}},
+    {"instancesOfDHCPRemoteServiceAccessPoint", {0, 1}, {0, 5}, {5, 25}},
+    {"getOfDHCPRemoteServiceAccessPoint", {0, 1}, {0, 5}, {9, 25}},
+    {"modifyOfDHCPSettingData", {0}, {0, 3}, {12}},
+    {"namesOfHostedDHCPPoint", {0, 1}, {5, 5}, {43, 15}},
+    {"instancesOfHostedDHCPPoint", {0, 1}, {5, 5}, {42, 20}},
+    {"getOfHostedDHCPPoint", {0}, {0}, {2}},
+    {"associatornamesOfComputerSystemThroughHostedDHCPPoint", {0, 1}, {1, 7}, {30, 10}},
+    {"associatorsOfComputerSystemThroughHostedDHCPPoint", {0, 1}, {1, 11}, {30, 36}},
+    {"referencenamesOfComputerSystemThroughHostedDHCPPoint", {0, 1}, {1, 7}, {28, 14}},
+    {"referencesOfComputerSystemThroughHostedDHCPPoint", {0, 1}, {1, 7}, {28, 19}},
+    {"associatornamesOfDHCPProtocolEndpointThroughHostedDHCPPoint", {1}, {5, 3}, {41}},
+    {"associatorsOfDHCPProtocolEndpointThroughHostedDHCPPoint", {1}, {5, 3}, {40}},
+    {"referencenamesOfDHCPProtocolEndpointThroughHostedDHCPPoint", {1}, {9, 3}, {51}},
+    {"referencesOfDHCPProtocolEndpointThroughHostedDHCPPoint", {1}, {9, 3}, {56}},
+    {"namesOfSAPSAPDependency", {0, 1}, {4, 5}, {20, 41}},
+    {"instancesOfSAPSAPDependency", {0, 1}, {4, 5}, {20, 46}},
+    {"getOfSAPSAPDependency", {0}, {0}, {2}},
+    {"associatornamesOfIPProtocolEndpointThroughSAPSAPDependency", {1}, {8, 6}, {49}},
+    {"associatorsOfIPProtocolEndpointThroughSAPSAPDependency", {1}, {12, 6}, {75}},
+    {"referencenamesOfIPProtocolEndpointThroughSAPSAPDependency", {1}, {8, 6}, {78}},
+    {"referencesOfIPProtocolEndpointThroughSAPSAPDependency", {1}, {8, 6}, {83}},
+    {"associatornamesOfDHCPProtocolEndpointThroughSAPSAPDependency", {1}, {4, 3}, {43}},
+    {"associatorsOfDHCPProtocolEndpointThroughSAPSAPDependency", {1}, {4, 3}, {42}},
+    {"referencenamesOfDHCPProtocolEndpointThroughSAPSAPDependency", {1}, {8, 3}, {80}},
+    {"referencesOfDHCPProtocolEndpointThroughSAPSAPDependency", {1}, {8, 3}, {85}},
+    {"namesOfDHCPElementCapabilities", {0, 1}, {6, 6, 1}, {41, 35}},
+    {"instancesOfDHCPElementCapabilities", {0, 1}, {6, 6, 1}, {40, 40}},
+    {"getOfDHCPElementCapabilities", {0}, {0}, {2}},
+    {"associatornamesOfDHCPProtocolEndpointThroughDHCPElementCapabilities", {1}, {4, 5}, {41}},
+    {"associatorsOfDHCPProtocolEndpointThroughDHCPElementCapabilities", {1}, {4, 5}, {53}},
+    {"referencenamesOfDHCPProtocolEndpointThroughDHCPElementCapabilities", {1}, {8, 6}, {70}},
+    {"referencesOfDHCPProtocolEndpointThroughDHCPElementCapabilities", {1}, {8, 6}, {75}},
+    {"associatornamesOfDHCPCapabilitiesThroughDHCPElementCapabilities", {1}, {5, 3}, {37}},
+    {"associatorsOfDHCPCapabilitiesThroughDHCPElementCapabilities", {1}, {9, 3}, {63}},
+    {"referencenamesOfDHCPCapabilitiesThroughDHCPElementCapabilities", {1}, {5, 4}, {60}},
+    {"referencesOfDHCPCapabilitiesThroughDHCPElementCapabilities", {1}, {5, 4}, {65}},
+    {"namesOfDHCPRemoteHostedAccessPoint", {0, 1}, {3, 3}, {40, 15}},
+    {"instancesOfDHCPRemoteHostedAccessPoint", {0, 1}, {3, 3}, {40, 20}},
+    {"getOfDHCPRemoteHostedAccessPoint", {0, 1}, {3, 3}, {40, 20}},
+    {"associatornamesOfComputerSystemThroughDHCPRemoteHostedAccessPoint", {0, 1}, {1, 3}, {30, 10}},
+    {"associatorsOfComputerSystemThroughDHCPRemoteHostedAccessPoint", {0, 1}, {1, 5}, {30, 25}},
+    {"referencenamesOfComputerSystemThroughDHCPRemoteHostedAccessPoint", {0, 1}, {1, 3}, {28, 14}},
+    {"referencesOfComputerSystemThroughDHCPRemoteHostedAccessPoint", {0, 1}, {1, 3}, {28, 19}},
+    {"associatornamesOfDHCPRemoteServiceAccessPointThroughDHCPRemoteHostedAccessPoint",
+     {1},
+     {2},
+     {41}},
+    {"associatorsOfDHCPRemoteServiceAccessPointThroughDHCPRemoteHostedAccessPoint", {1}, {2}, {40}},
+    {"referencenamesOfDHCPRemoteServiceAccessPointThroughDHCPRemoteHostedAccessPoint",
+     {1},
+     {4},
+     {51}},
+    {"referencesOfDHCPRemoteServiceAccessPointThroughDHCPRemoteHostedAccessPoint", {1}, {4}, {56}},
+    {"namesOfDHCPRemoteAccessAvailableToElement", {0, 1}, {10, 4, 1}, {48, 41}},
+    {"instancesOfDHCPRemoteAccessAvailableToElement", {0, 1}, {10, 4, 1}, {48, 47}},
+    {"getOfDHCPRemoteAccessAvailableToElement", {0, 1}, {10, 4, 1}, {48, 47}},
+    {"associatornamesOfDHCPRemoteServiceAccessPointThroughDHCPRemoteAccessAvailableToElement",
+     {1},
+     {9, 4},
+     {55}},
+    {"associatorsOfDHCPRemoteServiceAccessPointThroughDHCPRemoteAccessAvailableToElement",
+     {1},
+     {13, 4},
+     {81}},
+    {"referencenamesOfDHCPRemoteServiceAccessPointThroughDHCPRemoteAccessAvailableToElement",
+     {1},
+     {8, 4},
+     {84}},
+    {"referencesOfDHCPRemoteServiceAccessPointThroughDHCPRemoteAccessAvailableToElement",
+     {1},
+     {8, 4},
+     {90}},
+    {"associatornamesOfDHCPProtocolEndpointThroughDHCPRemoteAccessAvailableToElement",
+     {0, 1},
+     {4, 7},
+     {38, 10}},
+    {"associatorsOfDHCPProtocolEndpointThroughDHCPRemoteAccessAvailableToElement",
+     {0, 1},
+     {4, 9},
+     {38, 25}},
+    {"referencenamesOfDHCPProtocolEndpointThroughDHCPRemoteAccessAvailableToElement",
+     {0, 1},
+     {4, 8, 1},
+     {36, 41}},
+    {"referencesOfDHCPProtocolEndpointThroughDHCPRemoteAccessAvailableToElement",
+     {0, 1},
+     {4, 8, 1},
+     {36, 47}},
+    {"namesOfDHCPElementSettingData", {0, 1}, {14, 8, 1}, {31, 24}},
+    {"instancesOfDHCPElementSettingData", {0, 1}, {14, 8, 1}, {31, 30}},
+    {"getOfDHCPElementSettingData", {0, 1}, {14, 8, 1}, {31, 30}},
+    {"associatornamesOfDHCPProtocolEndpointThroughDHCPElementSettingData", {1}, {6, 9}, {41}},
+    {"associatorsOfDHCPProtocolEndpointThroughDHCPElementSettingData", {1}, {8, 9}, {49}},
+    {"referencenamesOfDHCPProtocolEndpointThroughDHCPElementSettingData", {1}, {10, 10}, {59}},
+    {"referencesOfDHCPProtocolEndpointThroughDHCPElementSettingData", {1}, {10, 10}, {65}},
+    {"associatornamesOfDHCPSettingDataThroughDHCPElementSettingData", {1}, {12, 7}, {42}},
+    {"associatorsOfDHCPSettingDataThroughDHCPElementSettingData", {1}, {16, 7}, {68}},
+    {"referencenamesOfDHCPSettingDataThroughDHCPElementSettingData", {1}, {14, 8}, {54}},
+    {"referencesOfDHCPSettingDataThroughDHCPElementSettingData", {1}, {14, 8}, {60}},
+    {"namesOfDHCPOrderedComponent", {0, 1}, {0, 4, 1}, {14, 20}},
+    {"instancesOfDHCPOrderedComponent", {0, 1}, {0, 4, 1}, {14, 26}},
+    {"getOfDHCPOrderedComponent", {0, 1}, {0, 4, 1}, {14, 26}},
+    {"associatornamesOfIPAssignmentSettingDataThroughDHCPOrderedComponent", {1}, {2, 6}, {28}},
+    {"associatorsOfIPAssignmentSettingDataThroughDHCPOrderedComponent", {1}, {4, 6}, {36}},
+    {"referencenamesOfIPAssignmentSettingDataThroughDHCPOrderedComponent", {1}, {2, 7}, {42}},
+    {"referencesOfIPAssignmentSettingDataThroughDHCPOrderedComponent", {1}, {2, 7}, {48}},
+    {"associatornamesOfDHCPSettingDataThroughDHCPOrderedComponent", {1}, {0, 4}, {26}},
+    {"associatorsOfDHCPSettingDataThroughDHCPOrderedComponent", {1}, {0, 4}, {25}},
+    {"referencenamesOfDHCPSettingDataThroughDHCPOrderedComponent", {1}, {2, 5}, {42}},
+    {"referencesOfDHCPSettingDataThroughDHCPOrderedComponent", {1}, {2, 5}, {48}},
+};
+
+class WorkTest : public test::TreeTest, public ::testing::WithParamInterface<Request> {
+  protected:
+    static void setInterfaces(std::uint64_t count) {
+        std::vector<test::Json> interfaces;
+        for (std::uint64_t i = 0; i < count; ++i) {
+            interfaces.push_back(test::dhcpInterface("eth" + std::to_string(i), {"192.0.2.1"}));
+            interfaces.back()["properties"]["IPv4Address"] = "192.0.2.10";
+        }
+        setTree({test::host(interfaces)});
+    }
+
+    /// The request for the last interface instead of the first.
+    static Request forTheLastOf(std::uint64_t count, Request request) {
+        const std::string first = "eth0";
+        if (const auto at = request.path.find(first); at != std::string::npos) {
+            request.path.replace(at, first.size(), "eth" + std::to_string(count - 1));
+        }
+        return request;
+    }
+
+    Host host_{Host::Neighbours::served, Host::Calls::counted};
+};
+
+TEST_P(WorkTest, GrowsAsItsAnswerAndItsPrescribedWalksDo) {
+    const std::string identifier = GetParam().identifier();
+    const auto expected =
+        std::find_if(expectedWork.begin(), expectedWork.end(),
+                     [&](const Work& work) { return identifier == work.request; });
+    ASSERT_NE(expected, expectedWork.end()) << "no expected work for " << identifier;
+    for (const std::uint64_t interfaces : {10U, 100U, 1000U}) {
+        SCOPED_TRACE(std::to_string(interfaces) + " interfaces");
+        setInterfaces(interfaces);
+        const std::uint64_t before = ZR::Instrumentation::nodeVisits();
+        const Host::Answer answer = run(host_, forTheLastOf(interfaces, GetParam()));
+        const std::uint64_t visits = ZR::Instrumentation::nodeVisits() - before;
+        EXPECT_EQ(answer.paths.size() + answer.instances.size(), expected->objects.at(interfaces));
+        EXPECT_EQ(visits, expected->visits.at(interfaces));
+        EXPECT_EQ(host_.counted().calls(), expected->calls.at(interfaces));
+    }
+}
+
+INSTANTIATE_TEST_SUITE_P(All, WorkTest, ::testing::ValuesIn(test::allRequests()),
+                         [](const auto& each) { return each.param.identifier(); });
+
+}  // namespace
