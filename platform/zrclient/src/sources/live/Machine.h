@@ -67,9 +67,6 @@ class Machine {
     [[nodiscard]] const std::vector<std::string>& complaints() const {
         return facts_.clients.complaints;
     }
-    [[nodiscard]] const std::optional<ServiceProcessor>& serviceProcessor() const {
-        return facts_.serviceProcessor;
-    }
 
   private:
     /// Which interface has an address.
