@@ -169,7 +169,10 @@ class Reader {
         CLI::App* const graph =
             command("graph", machineGroup, "Instances and associations, for Graphviz", graph_);
         graph->add_flag("--svg", graph_.svg, "Draw it as SVG (needs the package graphviz)");
-        command("tree", machineGroup, "What is known of the machine, as a JSON tree", tree_);
+        CLI::App* const tree =
+            command("tree", machineGroup, "What is known of the machine, as a JSON tree", tree_);
+        tree->add_flag("--explain", tree_.explain,
+                       "With each property, where it came from and why that counts");
     }
 
     void addInstanceCommands() {

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <nlohmann/json.hpp>
 
+#include "cimdhcp/DisplayText.h"
 #include "cimdhcp/JsonFormat.h"
 #include "cimdhcp/Table.h"
 
@@ -68,6 +69,21 @@ std::string overviewTable(const std::vector<InterfaceOverview>& interfaces,
         std::all_of(interfaces.begin(), interfaces.end(),
                     [](const InterfaceOverview& each) { return each.dhcp == false; });
     return table.text(width) + (noneUsesDhcp ? "No interface of this machine uses DHCP.\n" : "");
+}
+
+std::string remarkLine(std::span<const std::string> remarks) {
+    if (remarks.empty()) {
+        return {};
+    }
+    constexpr std::size_t mostTold = 4;
+    std::string line = "cimdhcp: not everything could be read: ";
+    for (const std::string& remark : remarks.first(std::min(remarks.size(), mostTold))) {
+        line += (&remark == &remarks.front() ? "" : "; ") + printable(remark);
+    }
+    if (remarks.size() > mostTold) {
+        line += "; and " + std::to_string(remarks.size() - mostTold) + " more, told in the log";
+    }
+    return line + '\n';
 }
 
 std::string overviewJson(const std::vector<InterfaceOverview>& interfaces) {

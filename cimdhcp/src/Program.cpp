@@ -24,7 +24,9 @@
 #include "cimdhcp/TableFormat.h"
 #include "cimdhcp/UserAdd.h"
 #include "zrclient/InstrumentationService.h"
+#include "zrclient/LiveSource.h"
 #include "zrclient/SnapshotJson.h"
+#include "zrcommon/PlatformSettings.h"
 #include "zrcommon/PlatformUtilities.h"
 
 namespace cimdhcp {
@@ -40,10 +42,12 @@ class Execution {
     void operator()(const ShowCommand& /*command*/) const {
         Client client = openClient();
         const ServedInstances served = askProvider(client);
-        auto interfaces = interfacesOf(*ZR::InstrumentationService::process().current());
+        const auto snapshot = ZR::InstrumentationService::process().current();
+        auto interfaces = interfacesOf(*snapshot);
         addServed(served, client.repository(), interfaces);
         outputs_.out << (json() ? overviewJson(interfaces)
                                 : overviewTable(interfaces, outputs_.width));
+        outputs_.err << remarkLine(snapshot->remarks());
     }
 
     void operator()(const RenameCommand& command) const {
@@ -59,8 +63,16 @@ class Execution {
         outputs_.out << (command.svg ? drawSvg(text) : text);
     }
 
-    void operator()(const TreeCommand& /*command*/) const {
-        outputs_.out << ZR::toJson(*ZR::InstrumentationService::process().current());
+    void operator()(const TreeCommand& command) const {
+        auto& service = ZR::InstrumentationService::process();
+        if (command.explain) {
+            if (!ZR::PlatformSettings::process().instrumentationTree.empty()) {
+                throw Failure(ExitStatus::usage,
+                              "only of the live machine it is known where properties came from");
+            }
+            service.useSource(ZR::openLiveSource(ZR::Explain::Yes));
+        }
+        outputs_.out << ZR::toJson(*service.current());
     }
 
     void operator()(const ClassesCommand& /*command*/) const {

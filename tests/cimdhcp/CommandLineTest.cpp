@@ -127,6 +127,11 @@ TEST_F(CommandLineText, ReadsTheCommandsOfTheServer) {
     EXPECT_EQ(line({"check"}).command, Command(CheckCommand()));
 }
 
+TEST_F(CommandLineText, ATreeMayBeExplained) {
+    EXPECT_EQ(line({"tree"}).command, Command(TreeCommand{false}));
+    EXPECT_EQ(line({"tree", "--explain"}).command, Command(TreeCommand{true}));
+}
+
 TEST_F(CommandLineText, TellsWhatIsWrong) {
     const std::string hint = " (\"cimdhcp --help\" tells more)";
     EXPECT_EQ(refusal({}), "a command is missing" + hint);

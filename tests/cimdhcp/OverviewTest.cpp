@@ -74,5 +74,17 @@ TEST(Overview, IsJson) {
 )");
 }
 
+TEST(RemarkLine, IsOneLineOrNone) {
+    EXPECT_EQ(remarkLine({}), "");
+    const std::vector<std::string> remarks{"cannot read /a: Permission denied", "cannot read \nb"};
+    EXPECT_EQ(remarkLine(std::span{remarks}.first(1)),
+              "cimdhcp: not everything could be read: cannot read /a: Permission denied\n");
+    const std::string both = remarkLine(remarks);
+    EXPECT_EQ(both.find('\n'), both.size() - 1) << both;
+    EXPECT_NE(both.find("Permission denied; cannot read"), std::string::npos) << both;
+    EXPECT_EQ(remarkLine(std::vector<std::string>{"a", "b", "c", "d", "e", "f"}),
+              "cimdhcp: not everything could be read: a; b; c; d; and 2 more, told in the log\n");
+}
+
 }  // namespace
 }  // namespace cimdhcp

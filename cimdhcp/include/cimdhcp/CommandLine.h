@@ -41,6 +41,8 @@ struct GraphCommand {
     bool operator==(const GraphCommand&) const = default;
 };
 struct TreeCommand {
+    bool explain = false;
+
     bool operator==(const TreeCommand&) const = default;
 };
 struct ClassesCommand {

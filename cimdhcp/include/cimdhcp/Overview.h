@@ -2,6 +2,7 @@
 
 #include <cstddef>
 #include <optional>
+#include <span>
 #include <string>
 #include <vector>
 
@@ -18,5 +19,9 @@ namespace cimdhcp {
 /// {"interfaces": [{"interface", "system", "dhcp", "state", "address", "servers",
 /// "configurationName"}]}; what is not known is null.
 [[nodiscard]] std::string overviewJson(const std::vector<InterfaceOverview>& interfaces);
+
+/// One line for what could not be read of the machine, with the first few of many;
+/// empty when there was nothing.
+[[nodiscard]] std::string remarkLine(std::span<const std::string> remarks);
 
 }  // namespace cimdhcp

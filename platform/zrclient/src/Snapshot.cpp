@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <bit>
+#include <cstddef>
 #include <optional>
 #include <unordered_map>
 #include <utility>
@@ -222,20 +223,19 @@ void SnapshotBuilder::property(NodeLexicon::Properties id, PropertyValue value, 
     }
     SnapshotProperty property{id, readOnly, std::move(value)};
     Snapshot::Node& node = nodes_.back();
-    for (std::size_t each = node.firstProperty; each < properties_.size(); ++each) {
-        if (properties_[each].id == id) {
-            properties_[each] = std::move(property);
-            return;
-        }
+    const auto own = properties_.begin() + static_cast<std::ptrdiff_t>(node.firstProperty);
+    auto place = std::find_if(own, properties_.end(),
+                              [id](const SnapshotProperty& each) { return each.id == id; });
+    const auto position = static_cast<std::size_t>(place - properties_.begin());
+    if (place != properties_.end()) {
+        *place = std::move(property);
+    } else {
+        properties_.push_back(std::move(property));
+        ++node.propertyCount;
     }
-    properties_.push_back(std::move(property));
-    ++node.propertyCount;
-}
-
-void SnapshotBuilder::origin(std::string text) {
-    if (!properties_.empty()) {
-        origins_.resize(properties_.size());
-        origins_.back() = std::move(text);
+    if (!origin_.empty() || position < origins_.size()) {
+        origins_.resize(std::max(origins_.size(), position + 1));
+        origins_[position] = origin_;
     }
 }
 
@@ -244,6 +244,7 @@ std::shared_ptr<const Snapshot> SnapshotBuilder::build() {
     snapshot.nodes_ = std::exchange(nodes_, {});
     snapshot.properties_ = std::exchange(properties_, {});
     snapshot.origins_ = std::exchange(origins_, {});
+    origin_.clear();
     snapshot.remarks_ = std::exchange(remarks_, {});
     // A snapshot is kept much longer than it takes to build it.
     snapshot.nodes_.shrink_to_fit();

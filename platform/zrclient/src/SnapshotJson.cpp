@@ -40,6 +40,7 @@ Json alone(const Snapshot& snapshot, Snapshot::Index index) {
     Json result{{"type", node.type}, {"description", node.description}};
     Json properties = Json::object();
     Json readOnly = Json::array();
+    Json origins = Json::object();
     for (const SnapshotProperty& property : snapshot.properties(index)) {
         const std::string name(nameOf(property.id));
         if (name.empty()) {
@@ -49,12 +50,18 @@ Json alone(const Snapshot& snapshot, Snapshot::Index index) {
         if (property.readOnly) {
             readOnly.push_back(name);
         }
+        if (const auto origin = snapshot.origin(index, property.id); !origin.empty()) {
+            origins[name] = std::string(origin);
+        }
     }
     if (!properties.empty()) {
         result["properties"] = std::move(properties);
     }
     if (!readOnly.empty()) {
         result["readOnly"] = std::move(readOnly);
+    }
+    if (!origins.empty()) {
+        result["origins"] = std::move(origins);
     }
     return result;
 }

@@ -96,5 +96,23 @@ TEST(SnapshotJson, TenThousandInterfacesComeBackEqual) {
     EXPECT_TRUE(*parsed(toJson(*snapshot)) == *snapshot);
 }
 
+TEST(SnapshotJson, WhereAPropertyCameFromIsWrittenAndPassedOver) {
+    const auto build = [](const std::string& origin) {
+        SnapshotBuilder builder;
+        builder.origin(origin);
+        builder.add(Snapshot::none, "ComputerSystem", "Computer");
+        builder.property(Properties::Name, std::string("host"));
+        return builder.build();
+    };
+    const std::string json = toJson(*build("a file"));
+    EXPECT_NE(json.find(R"("origins": {
+        "Name": "a file"
+      })"),
+              std::string::npos)
+        << json;
+    EXPECT_TRUE(*parsed(json) == *build(""));
+    EXPECT_EQ(toJson(*build("")).find("origins"), std::string::npos);
+}
+
 }  // namespace
 }  // namespace ZR::Testing

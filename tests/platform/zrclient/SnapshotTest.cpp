@@ -265,5 +265,35 @@ TEST(Snapshot, TenThousandInterfacesStayUnderTenMegabytes) {
 #endif
 }
 
+TEST(Snapshot, APropertyMaySayWhereItCameFrom) {
+    SnapshotBuilder builder;
+    const Index node = builder.add(Snapshot::none, "ComputerSystem", "Computer");
+    builder.property(Properties::Name, std::string("host"));
+    builder.origin("a file");
+    builder.property(Properties::NameMaxLength, std::uint64_t{64});
+    builder.property(Properties::DHCPEnabled, true);
+    builder.origin("another file");
+    builder.property(Properties::NameMaxLength, std::uint64_t{65});
+    const auto snapshot = builder.build();
+    EXPECT_EQ(snapshot->origin(node, Properties::Name), "");
+    EXPECT_EQ(snapshot->origin(node, Properties::NameMaxLength), "another file");
+    EXPECT_EQ(snapshot->origin(node, Properties::DHCPEnabled), "a file");
+    EXPECT_EQ(snapshot->origin(node, Properties::AddressSource), "");
+    // The builder begins anew.
+    builder.add(Snapshot::none, "ComputerSystem", "Computer");
+    builder.property(Properties::Name, std::string("host"));
+    EXPECT_EQ(builder.build()->origin(0, Properties::Name), "");
+}
+
+TEST(Snapshot, WhatCouldNotBeReadIsARemark) {
+    SnapshotBuilder builder;
+    builder.remark("cannot read this");
+    builder.remark("nor that");
+    const auto snapshot = builder.build();
+    ASSERT_EQ(snapshot->remarks().size(), 2U);
+    EXPECT_EQ(snapshot->remarks()[1], "nor that");
+    EXPECT_TRUE(builder.build()->remarks().empty());
+}
+
 }  // namespace
 }  // namespace ZR

@@ -108,8 +108,9 @@ class SnapshotBuilder {
     /// replaced in its place. Without a node there is nothing to add to.
     void property(NodeLexicon::Properties id, PropertyValue value, bool readOnly = false);
 
-    /// Says where the property added last came from.
-    void origin(std::string text);
+    /// Says where the properties that are added from now on come from. Nobody who says
+    /// nothing pays anything.
+    void origin(std::string text) { origin_ = std::move(text); }
 
     /// Adds what could not be read, or not for certain.
     void remark(std::string text) { remarks_.push_back(std::move(text)); }
@@ -120,6 +121,7 @@ class SnapshotBuilder {
   private:
     std::vector<Snapshot::Node> nodes_;
     std::vector<SnapshotProperty> properties_;
+    std::string origin_;
     std::vector<std::string> origins_;
     std::vector<std::string> remarks_;
 };

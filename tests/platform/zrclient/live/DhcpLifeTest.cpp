@@ -86,6 +86,25 @@ void start(const std::string& options) {
     EXPECT_TRUE(eventually([] { return !File::read("/run/client.pid").value_or("").empty(); }));
 }
 
+/// The client's way through a lease: it starts, shows its lease, gives it back.
+void liveThroughWith(const char* program, const std::string& startCommand,
+                     const std::string& releaseCommand) {
+    const Laboratory laboratory{"600s"};
+    Watched eth1;
+    EXPECT_EQ(eth1[Properties::DHCPServerAddresses], PropertyValue{Servers{}});
+    run(startCommand);
+    EXPECT_TRUE(eventually([&] {
+        return eth1[Properties::DHCPServerAddresses] == PropertyValue{Servers{"198.51.100.1"}};
+    })) << program;
+    EXPECT_EQ(eth1[Properties::DHCPEnabled], PropertyValue{true});
+    EXPECT_EQ(eth1[Properties::AddressSource], number(1));
+    run(releaseCommand);
+    EXPECT_TRUE(eventually([&] {
+        return eth1[Properties::DHCPServerAddresses] == PropertyValue{Servers{}} &&
+               eth1[Properties::IPv4Address] == PropertyValue{};
+    })) << program;
+}
+
 void expectLeased(Watched& eth1) {
     EXPECT_TRUE(eventually([&] {
         return eth1[Properties::DHCPServerAddresses] == PropertyValue{Servers{"198.51.100.1"}};
@@ -128,6 +147,45 @@ TEST(DhcpLife, ALeaseInAFileOfTheClientsOwnChoiceShowsToo) {
     EXPECT_TRUE(passesInNamespaces(30, [] {
         run("mkdir /run/elsewhere");
         liveThrough("-lf /run/elsewhere/own.db", "600s");
+    }));
+}
+
+TEST(DhcpLife, ALeaseOfDhcpcdShowsToo) {
+    ZR_NEEDS_NAMESPACES();
+    ZR_NEEDS_DHCP();
+    if (::access("/usr/sbin/dhcpcd", X_OK) != 0) {
+        GTEST_SKIP() << "needs dhcpcd";
+    }
+    EXPECT_TRUE(passesInNamespaces(60, [] {
+        run("mkdir /var/lib/dhcpcd");
+        liveThroughWith("dhcpcd",
+                        "dhcpcd --nohook resolv.conf --noipv4ll --nodelay --noarp --nodev -4 -w "
+                        "eth1 < /dev/null",
+                        "dhcpcd -4 -k eth1 < /dev/null");
+    }));
+}
+
+TEST(DhcpLife, ALeaseOfUdhcpcShowsWithItsServerWhereItsScriptTellsIt) {
+    ZR_NEEDS_NAMESPACES();
+    ZR_NEEDS_DHCP();
+    if (::access("/usr/sbin/udhcpc", X_OK) != 0) {
+        GTEST_SKIP() << "needs udhcpc";
+    }
+    EXPECT_TRUE(passesInNamespaces(60, [] {
+        const TemporaryDirectory directory;
+        directory.write("/script", R"(#!/bin/sh
+case $1 in
+    bound) ip address add "$ip/$mask" dev "$interface"
+        printf 'ip=%s\nserverid=%s\nlease=%s\n' "$ip" "$serverid" "$lease" \
+            >"/run/udhcpc.$interface.state" ;;
+    deconfig) ip -4 address flush dev "$interface"; rm -f "/run/udhcpc.$interface.state" ;;
+esac
+)");
+        const std::string script = directory.path("/script");
+        run("chmod 755 " + script);
+        liveThroughWith("udhcpc",
+                        "udhcpc -i eth1 -b -p /run/udhcpc.pid -s " + script + " < /dev/null",
+                        "kill -USR2 $(cat /run/udhcpc.pid)");
     }));
 }
 

@@ -146,6 +146,16 @@ TEST_F(LiveMachineTest, WhatCannotBeReadIsARemark) {
     EXPECT_THAT(machine.read()->remarks(), IsEmpty());
 }
 
+TEST_F(LiveMachineTest, WhatSeveralReadersCannotReadIsToldOnce) {
+    // Leases of two clients lie there; a link to itself is nothing that can be read.
+    const std::string place = root_.path("/var/lib/NetworkManager");
+    std::filesystem::create_directories(root_.path("/var/lib"));
+    std::filesystem::create_symlink(place, place);
+    const auto tree = open({links(1), address(2, {192, 0, 2, 1})}).read();
+    EXPECT_THAT(tree->remarks(), testing::UnorderedElementsAre(HasSubstr("cannot read " + place),
+                                                               HasSubstr("cannot watch " + place)));
+}
+
 TEST_F(LiveMachineTest, TheComputerHasTheHostsName) {
     const auto tree = open({links(1), address(2, {192, 0, 2, 1})}).read();
     const auto* const name = tree->find(0, Properties::Name);

@@ -260,6 +260,77 @@ TEST_F(RtnetlinkReaderTest, UnreadableAddressesLeaveTheLinks) {
     EXPECT_THAT(state.complaints, ElementsAre("network addresses: refused: Permission denied"));
 }
 
+TEST_F(RtnetlinkReaderTest, AnInterruptedDumpOfAddressesIsRepeatedAlone) {
+    const Message end{NLMSG_DONE, NLM_F_MULTI | NLM_F_DUMP_INTR, std::int32_t{0}};
+    const NetworkState state =
+        read({someLinks(), {parts({addressMessage(2, {192, 0, 2, 1}), end})}, someAddresses()});
+    ASSERT_EQ(state.addresses.size(), 1U);
+    EXPECT_EQ(state.addresses[0].text, "198.51.100.7");
+    EXPECT_TRUE(state.certain);
+    EXPECT_EQ(transport_->asked(), 3);
+}
+
+TEST_F(RtnetlinkReaderTest, AddressesThatWereLostAreAskedForAgain) {
+    const NetworkState state =
+        read({someLinks(),
+              {parts({addressMessage(2, {192, 0, 2, 1})}), Step::failing(ENOBUFS)},
+              someAddresses()});
+    ASSERT_EQ(state.addresses.size(), 1U);
+    EXPECT_EQ(state.addresses[0].text, "198.51.100.7");
+    EXPECT_TRUE(state.certain);
+}
+
+TEST_F(RtnetlinkReaderTest, EveryRefusalLeavesNoLinksAndIsUncertain) {
+    for (const int code : {EBUSY, ENODEV, ENOMEM, EOPNOTSUPP, EINVAL}) {
+        const NetworkState state = read({{parts({refusal(code)})}});
+        EXPECT_THAT(state.links, IsEmpty()) << code;
+        EXPECT_FALSE(state.certain) << code;
+        EXPECT_THAT(state.complaints, ElementsAre(HasSubstr("network links: "))) << code;
+    }
+}
+
+TEST_F(RtnetlinkReaderTest, ARefusalWithinADumpEndsIt) {
+    const NetworkState state =
+        read({{parts({linkMessage(2, "half")}), parts({refusal(ENOMEM)})}, someAddresses()});
+    EXPECT_THAT(state.links, IsEmpty());
+    EXPECT_FALSE(state.certain);
+}
+
+TEST_F(RtnetlinkReaderTest, AddressesOfALinkThatVanishedMeanwhileStay) {
+    // Whoever joins the two leaves them out.
+    const NetworkState state =
+        read({someLinks(),
+              {parts({addressMessage(9, {192, 0, 2, 9}), addressMessage(2, own), done()})}});
+    EXPECT_THAT(names(state), ElementsAre("lo", "eth0"));
+    EXPECT_EQ(state.addresses.size(), 2U);
+    EXPECT_TRUE(state.certain);
+}
+
+TEST_F(RtnetlinkReaderTest, AttributesWithoutAPayloadTellNothing) {
+    Message bare = linkMessage(3, "bare");
+    for (const std::uint16_t type :
+         {IFLA_OPERSTATE, IFLA_CARRIER, IFLA_MASTER, IFLA_LINKINFO, IFLA_LINK_NETNSID}) {
+        bare.attribute(type, {});
+    }
+    Message nameless = linkMessage(4, "nameless");
+    nameless.attribute(IFLA_IFNAME, {});
+    const NetworkState state = read({{parts({bare, nameless, done()})}, someAddresses()});
+    ASSERT_THAT(names(state), ElementsAre("bare"));
+    EXPECT_EQ(state.links[0].operstate, 0);
+    EXPECT_EQ(state.links[0].carrier, std::nullopt);
+    EXPECT_EQ(state.links[0].master, 0U);
+    EXPECT_EQ(state.links[0].kind, "");
+    EXPECT_FALSE(state.certain) << "a link without a name is none";
+}
+
+TEST_F(RtnetlinkReaderTest, WhatSaysNothingIsSkipped) {
+    const Message nothing{NLMSG_NOOP, NLM_F_MULTI, std::int32_t{0}};
+    const NetworkState state =
+        read({{parts({nothing, linkMessage(2, "eth0"), nothing, done()})}, someAddresses()});
+    EXPECT_THAT(names(state), ElementsAre("eth0"));
+    EXPECT_TRUE(state.certain);
+}
+
 TEST_F(RtnetlinkReaderTest, ASocketThatCannotBeOpenedIsAReason) {
     auto transport = std::make_unique<ScriptedTransport>(std::deque<std::vector<Step>>{});
     transport->refuseToOpen(EMFILE);

@@ -187,10 +187,14 @@ void ChangeMonitor::watch(const WatchedPlace& place, Interests& interests,
         previous = ancestor;
     }
     const int error = errno;
+    if (error == EACCES) {
+        // A directory that may not be read holds nothing that was read either, and
+        // its reader says so.
+        return;
+    }
+    // Anything else, like a limit that was reached, leaves changes unnoticed.
     complaints.push_back("cannot watch " + place.directory + ": " + reasonOf(error));
-    // A directory that may not be read holds nothing that was read either. Anything
-    // else, like a limit that was reached, leaves changes unnoticed.
-    blind_ = blind_ || error != EACCES;
+    blind_ = true;
 }
 
 /// Watches the nearest existing ancestor. `missing` becomes the name below it

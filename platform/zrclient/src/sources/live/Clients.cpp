@@ -18,6 +18,9 @@
 namespace ZR::Live {
 namespace {
 
+// Nothing tells of a process that starts; but most clients write its number before long.
+constexpr std::string_view pidDirectory = "/run";
+
 constexpr std::array networkdPlaces{ClientPlace{networkdLinksDirectory, ""},
                                     ClientPlace{networkdLeasesDirectory, ""}};
 constexpr std::array networkManagerPlaces{
@@ -28,13 +31,16 @@ constexpr std::array wickedPlaces{ClientPlace{wickedDirectories[0], wickedLeaseP
                                   ClientPlace{wickedDirectories[1], wickedLeasePrefix}};
 constexpr std::array dhclientPlaces{ClientPlace{dhclientDirectories[0].path, dhclientNamePrefix},
                                     ClientPlace{dhclientDirectories[1].path, dhclientNamePrefix},
-                                    ClientPlace{dhclientDirectories[2].path, dhclientNamePrefix}};
+                                    ClientPlace{dhclientDirectories[2].path, dhclientNamePrefix},
+                                    ClientPlace{pidDirectory, dhclientNamePrefix}};
 constexpr std::array dhcpcdPlaces{
     ClientPlace{dhcpcdDirectories[0].path, dhcpcdDirectories[0].namePrefix},
     ClientPlace{dhcpcdDirectories[1].path, dhcpcdDirectories[1].namePrefix},
-    ClientPlace{dhcpcdDirectories[2].path, dhcpcdDirectories[2].namePrefix}};
+    ClientPlace{dhcpcdDirectories[2].path, dhcpcdDirectories[2].namePrefix},
+    ClientPlace{"/run/dhcpcd", ""}};
 constexpr std::array udhcpcPlaces{ClientPlace{udhcpcStateDirectory, udhcpcStatePrefix}};
 constexpr std::array ipconfigPlaces{ClientPlace{ipconfigDirectory, ipconfigPrefix}};
+constexpr std::array dhcp6cPlaces{ClientPlace{pidDirectory, "dhcp6c"}};
 constexpr std::array netplanPlaces{ClientPlace{netplanDirectory, ""}};
 constexpr std::array ifupdownPlaces{ClientPlace{ifupdownDirectory, ifupdownFile},
                                     ClientPlace{ifupdownStateDirectory, ifupdownStateFile}};
@@ -42,9 +48,9 @@ constexpr std::array ifcfgPlaces{ClientPlace{ifcfgDirectories[0], ifcfgPrefix},
                                  ClientPlace{ifcfgDirectories[1], ifcfgPrefix}};
 
 // Managers before the clients that they may start, and those before what is left of
-// the boot. Processes and sockets have no files that could be watched.
+// the boot. Sockets have no files that could be watched.
 constexpr std::array sources{
-    ClientSource{readProcesses, {}},
+    ClientSource{readProcesses, dhcp6cPlaces},
     ClientSource{readNetworkd, networkdPlaces},
     ClientSource{readNetworkManager, networkManagerPlaces},
     ClientSource{readWicked, wickedPlaces},

@@ -422,6 +422,9 @@ std::vector<Decision> decide(InterfaceView view) {
 std::shared_ptr<const Snapshot> decide(MachineFacts facts, std::int64_t now, Explain explain) {
     const Machine machine{std::move(facts), now};
     SnapshotBuilder builder;
+    if (explain == Explain::Yes) {
+        builder.origin("kernel: the name of the system");
+    }
     const auto computer = builder.add(Snapshot::none, "ComputerSystem", "Computer");
     builder.property(Properties::Name, machine.hostName());
     builder.property(Properties::NameMaxLength, hostNameMaxLength);
@@ -432,13 +435,16 @@ std::shared_ptr<const Snapshot> decide(MachineFacts facts, std::int64_t now, Exp
             // A link can be renamed, but not by a client of this tree: the kernel forgets
             // the new name at the next start, and leases and settings are found by name.
             const bool readOnly = decision.property == Properties::Name;
-            builder.property(decision.property, std::move(decision.value), readOnly);
             if (explain == Explain::Yes) {
                 builder.origin(describe(decision.origin) + ": " + std::string{decision.reason});
             }
+            builder.property(decision.property, std::move(decision.value), readOnly);
         }
     }
     if (machine.serviceProcessor()) {
+        if (explain == Explain::Yes) {
+            builder.origin("service processor, by IPMI");
+        }
         addServiceProcessor(*machine.serviceProcessor(), builder);
     }
     for (const std::string& complaint : machine.complaints()) {

@@ -96,7 +96,7 @@ class Reader {
 
   private:
     static std::string absolute(const std::string& path, const std::string& directory) {
-        return path.starts_with('/') ? path : directory + '/' + path;
+        return path.starts_with('/') ? path : pathIn(directory, path);
     }
 
     void readMatching(const std::string& directory, const std::string& pattern, int depth) {
@@ -105,7 +105,7 @@ class Reader {
             {.directory = place, .namePrefix = pattern.substr(0, pattern.find_first_of("*?[\\"))});
         for (const std::string& name : listOptionalDirectory(place, facts_.complaints)) {
             if (::fnmatch(pattern.c_str(), name.c_str(), FNM_PERIOD) == 0) {
-                readFile(directory + '/' + name, depth + 1);
+                readFile(pathIn(directory, name), depth + 1);
             }
         }
     }

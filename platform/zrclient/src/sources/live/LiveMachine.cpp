@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <iterator>
+#include <unordered_set>
 #include <utility>
 
 #include "Clients.h"
@@ -53,6 +54,13 @@ void markWireless(const Roots& roots, std::vector<Link>& links) {
     }
 }
 
+/// Several readers may meet one obstacle.
+void removeRepeated(std::vector<std::string>& complaints) {
+    std::unordered_set<std::string> met;
+    std::erase_if(complaints,
+                  [&](const std::string& complaint) { return !met.insert(complaint).second; });
+}
+
 void complainToLog(std::string_view message) {
     TKLog::TKLogger::logLevelMessage("zrclient/LiveMachine", "read", __LINE__, "ZR.Instrumentation",
                                      errorLevel, nullptr, 0, 0, message);
@@ -90,6 +98,7 @@ std::shared_ptr<const Snapshot> LiveMachine::read() {
     }
     markWireless(surroundings_.roots, network.links);
     std::optional<ServiceProcessor> processor = processor_.read(clients.complaints);
+    removeRepeated(clients.complaints);
     report(clients.complaints);
     return decide({.hostName = getSystemName(),
                    .links = std::move(network.links),
@@ -145,11 +154,11 @@ ClientFacts LiveMachine::readClients() {
 /// line, however often the machine is read.
 void LiveMachine::report(const std::vector<std::string>& complaints) {
     for (const std::string& complaint : complaints) {
-        if (std::find(reported_.begin(), reported_.end(), complaint) == reported_.end()) {
+        if (!reported_.contains(complaint)) {
             surroundings_.complain(complaint);
         }
     }
-    reported_ = complaints;
+    reported_ = {complaints.begin(), complaints.end()};
 }
 
 }  // namespace ZR::Live

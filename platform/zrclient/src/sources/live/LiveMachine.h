@@ -6,6 +6,7 @@
 #include <memory>
 #include <string>
 #include <string_view>
+#include <unordered_set>
 #include <vector>
 
 #include "ChangeMonitor.h"
@@ -56,7 +57,7 @@ class LiveMachine final : public SnapshotSource {
     ChangeMonitor monitor_;
     IpmiReader processor_;
     std::vector<WatchedPlace> places_;
-    std::vector<std::string> reported_;
+    std::unordered_set<std::string> reported_;
 };
 
 }  // namespace ZR::Live

@@ -61,11 +61,11 @@ class Machine {
 
     [[nodiscard]] std::span<const InterfaceView> interfaces() const { return views_; }
     [[nodiscard]] const std::string& hostName() const { return facts_.hostName; }
-    [[nodiscard]] const std::vector<std::string>& complaints() const {
-        return facts_.clients.complaints;
-    }
     [[nodiscard]] const std::optional<ServiceProcessor>& serviceProcessor() const {
         return facts_.serviceProcessor;
+    }
+    [[nodiscard]] const std::vector<std::string>& complaints() const {
+        return facts_.clients.complaints;
     }
 
   private:

@@ -21,6 +21,8 @@ namespace {
 
 constexpr std::uint16_t clientPort = 68;  // RFC 2131, section 4.1
 constexpr int hexadecimal = 16;
+constexpr std::uint16_t everyProtocol = ETH_P_ALL;
+constexpr std::uint16_t ipv4Protocol = ETH_P_IP;
 
 /// The words of a line, as many as there is room for.
 template <std::size_t size>
@@ -93,9 +95,11 @@ std::vector<std::uint32_t> parsePacketLinks(std::string_view text) {
     std::vector<std::uint32_t> links;
     // Address, references, type, protocol, link.
     forEachLine<5>(text, [&](const std::array<std::string_view, 5>& words) {
-        const auto protocol = parseNumber<std::uint16_t>(words[3], hexadecimal);
+        const std::uint16_t protocol =
+            parseNumber<std::uint16_t>(words[3], hexadecimal).value_or(0);
         const auto link = parseNumber<std::uint32_t>(words[4]);
-        if ((protocol == ETH_P_ALL || protocol == ETH_P_IP) && link && *link != 0 &&
+        const bool heard = protocol == everyProtocol || protocol == ipv4Protocol;
+        if (heard && link && *link != 0 &&
             std::find(links.begin(), links.end(), *link) == links.end()) {
             links.push_back(*link);
         }
