@@ -312,18 +312,18 @@ bool ProviderUtilities::transformMonikerToObjectPath(Moniker& moniker, CMPIObjec
         return false;
     }
     const CMPIString* className = (*path)->ft->getClassName(*path, nullptr);
+    const std::string name(textOf(className));
     CMPIObjectPath* transformed =
         className == nullptr ? nullptr
-                             : createObjectPath(lastBroker, std::string(textOf(className)).c_str(),
-                                                getNamespace(*path));
+                             : createObjectPath(lastBroker, name.c_str(), getNamespace(*path));
     if (transformed == nullptr) {
         return false;
     }
     for (std::size_t i = 0; i < moniker.getKeyCount(); ++i) {
-        std::string name;
+        std::string key;
         std::string value;
-        if (!moniker.selectKey(i) || !moniker.getName(name) || !moniker.getValue(value) ||
-            !setKeyProperty(transformed, name.c_str(), value)) {
+        if (!moniker.selectKey(i) || !moniker.getName(key) || !moniker.getValue(value) ||
+            !setKeyProperty(transformed, key.c_str(), value)) {
             return false;
         }
     }
