@@ -122,8 +122,11 @@ bool ProviderUtilities::areClassesRelated(const CMPIBroker* broker, const std::s
     if (broker == nullptr || parent == nullptr) {
         return false;
     }
-    return classIsA(broker, nameSpace, className, parent) ||
-           classIsA(broker, nameSpace, parent, className);
+    if (classIsA(broker, nameSpace, className, parent)) {
+        return true;
+    }
+    // NOLINTNEXTLINE(readability-suspicious-call-argument): either may be the ancestor
+    return classIsA(broker, nameSpace, parent, className);
 }
 
 std::string ProviderUtilities::getNamespace(const CMPIObjectPath* path) {
@@ -312,18 +315,21 @@ bool ProviderUtilities::transformMonikerToObjectPath(Moniker& moniker, CMPIObjec
         return false;
     }
     const CMPIString* className = (*path)->ft->getClassName(*path, nullptr);
+    if (className == nullptr) {
+        return false;
+    }
+    // One after the other: as arguments, a compiler asks for them in any order.
     const std::string name(textOf(className));
-    CMPIObjectPath* transformed =
-        className == nullptr ? nullptr
-                             : createObjectPath(lastBroker, name.c_str(), getNamespace(*path));
+    const std::string nameSpace = getNamespace(*path);
+    CMPIObjectPath* transformed = createObjectPath(lastBroker, name.c_str(), nameSpace);
     if (transformed == nullptr) {
         return false;
     }
     for (std::size_t i = 0; i < moniker.getKeyCount(); ++i) {
-        std::string key;
+        std::string keyName;
         std::string value;
-        if (!moniker.selectKey(i) || !moniker.getName(key) || !moniker.getValue(value) ||
-            !setKeyProperty(transformed, key.c_str(), value)) {
+        if (!moniker.selectKey(i) || !moniker.getName(keyName) || !moniker.getValue(value) ||
+            !setKeyProperty(transformed, keyName.c_str(), value)) {
             return false;
         }
     }
