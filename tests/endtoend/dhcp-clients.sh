@@ -232,6 +232,19 @@ eventually leased || { explain; fail "$kind gets no lease"; }
 step "with a lease"
 expect 198.51.100.1 cimdhcp show
 
+# Whoever may not read a source is told so in one line, and sees what is left.
+as_nobody() {
+    in_client setpriv --reuid 65534 --regid 65534 --clear-groups env ZR_LOG_SINK=none \
+        ZR_DATA_DIR="$work/data" "$program" "$@"
+}
+if [[ $kind == dhcpcd ]] && as_nobody --version >/dev/null 2>&1; then
+    as_nobody show >"$work/shown" 2>"$work/told" || fail "show as nobody answers status $?"
+    [[ $(wc -l <"$work/told") == 1 ]] || fail "not one line: $(<"$work/told")"
+    grep -q "cannot read /var/lib/dhcpcd/eth1.lease: Permission denied" "$work/told" ||
+        fail "not told: $(<"$work/told")"
+    grep -Eq "^eth1 +on .*$(kernel_address)" "$work/shown" || fail "not shown: $(<"$work/shown")"
+fi
+
 ip -n "$client" link set cable down
 step "with the cable out"
 [[ $(value InterfaceState) == 0 ]] || fail "active without a cable"
