@@ -198,18 +198,19 @@ current=eth1
 agrees() {
     local address operstate state=0 expected='[]'
     address=$(kernel_address "$current")
+    look || return 1
     operstate=$(ip -n "$client" -j link show dev "$current" | jq -r '.[0].operstate')
     [[ $operstate == UP ]] && state=1
-    [[ $(value InterfaceState "$current") == "$state" ]] || return 1
+    [[ $(seen InterfaceState "$current") == "$state" ]] || return 1
     if [[ -z $address ]]; then
-        [[ -z $(value IPv4Address "$current") ]] || return 1
+        [[ -z $(seen IPv4Address "$current") ]] || return 1
     else
-        [[ $(value IPv4Address "$current") == "\"$address\"" ]] || return 1
-        [[ $(value AddressSource "$current") == 1 ]] || return 1
-        [[ $(value DHCPEnabled "$current") == true ]] || return 1
+        [[ $(seen IPv4Address "$current") == "\"$address\"" ]] || return 1
+        [[ $(seen AddressSource "$current") == 1 ]] || return 1
+        [[ $(seen DHCPEnabled "$current") == true ]] || return 1
         [[ $(said_address) == "$address" ]] && expected="[\"$(said_server)\"]"
     fi
-    [[ $(value DHCPServerAddresses "$current") == "$expected" ]]
+    [[ $(seen DHCPServerAddresses "$current") == "$expected" ]]
 }
 explain() {
     echo "--- the program:"; cimdhcp tree
@@ -218,7 +219,7 @@ explain() {
 }
 step() {
     eventually agrees || { explain; fail "$kind, $1: the program shows something else"; }
-    echo "$kind, $1: $(value IPv4Address "$current") from $(value DHCPServerAddresses "$current")"
+    echo "$kind, $1: $(seen IPv4Address "$current") from $(seen DHCPServerAddresses "$current")"
 }
 leased() {
     [[ -n $(kernel_address "$current") && $(said_address) == "$(kernel_address "$current")" ]]

@@ -42,7 +42,7 @@ for ((attempt = 0; attempt < 3; ++attempt)); do
     eventually both && break
 done
 both || { explain; fail "not both servers, 198.51.100.1 and $link_local"; }
-[[ $(value DHCPEnabled) == true && $(value AddressSource) == 1 ]] || { explain; fail "no DHCP"; }
+[[ $(seen DHCPEnabled) == true && $(seen AddressSource) == 1 ]] || { explain; fail "no DHCP"; }
 expect "$link_local" cimdhcp show
 expect 'systemd-networkd /run/systemd/netif/leases/' cimdhcp tree --explain
 
