@@ -5,69 +5,20 @@
 // Prints Google Benchmark's figures and, below them, the ratios of the same run.
 
 #include <benchmark/benchmark.h>
-#include <unistd.h>
 
-#include <array>
 #include <cstdio>
-#include <cstdlib>
-#include <fstream>
 #include <map>
 #include <string>
 #include <vector>
 
 #include "CMPI/Host.h"
+#include "Machine.h"
 #include "include/TracePoint.h"
 #include "providerutilities/ProviderUtilities.h"
-#include "tklogger/TKLogger.h"
 
 namespace {
 
 using ZR::ProviderUtilities;
-
-std::string treeFile;
-
-/// A machine with so many interfaces, all of which use DHCP.
-void writeTree(std::int64_t interfaces) {
-    const std::string next = treeFile + ".next";
-    std::ofstream out(next);
-    out << R"({"nodes":[{"type":"ComputerSystem","description":"Computer",)"
-        << R"("properties":{"Name":"${HOSTNAME}"},"children":[)"
-        << R"({"type":"Network","description":"Network","children":[)";
-    for (std::int64_t i = 0; i < interfaces; ++i) {
-        out << (i == 0 ? "" : ",")
-            << R"({"type":"NetworkInterface","description":"Ethernet interface","properties":{)"
-            << R"("Name":"eth)" << i << R"(","NameMaxLength":15,"DHCPEnabled":true,)"
-            << R"("AddressSource":1,"InterfaceState":1,"DHCPServerAddresses":["192.0.2.1"],)"
-            << R"("IPv4Address":"192.0.2.2"}})";
-    }
-    out << "]}]}]}";
-    out.close();
-    if (std::rename(next.c_str(), treeFile.c_str()) != 0) {
-        std::perror(treeFile.c_str());
-        std::exit(1);
-    }
-}
-
-/// A result that takes what it is given and keeps nothing of it.
-struct CountingResult {
-    std::int64_t objects = 0;
-    CMPIResult record{this, &table};
-
-    static CMPIStatus count(const CMPIResult* result) {
-        ++static_cast<CountingResult*>(result->hdl)->objects;
-        return {CMPI_RC_OK, nullptr};
-    }
-
-    static inline const CMPIResultFT table{
-        200,
-        nullptr,
-        nullptr,
-        [](const CMPIResult*, const CMPIValue*, CMPIType) { return CMPIStatus{}; },
-        [](const CMPIResult* result, const CMPIInstance*) { return count(result); },
-        [](const CMPIResult* result, const CMPIObjectPath*) { return count(result); },
-        [](const CMPIResult*) { return CMPIStatus{}; },
-        [](const CMPIResult*, const CMPIError*) { return CMPIStatus{}; }};
-};
 
 struct PlainEndpoint {
     std::string name;
@@ -118,7 +69,7 @@ void floorOfInstances(benchmark::State& state) {
     for (std::int64_t i = 0; i < state.range(0); ++i) {
         endpoints.push_back({"eth" + std::to_string(i), "host.example"});
     }
-    CountingResult result;
+    bench::CountingResult result;
     for (auto _ : state) {
         const cimom::broker::RequestScope scope;
         makePlainInstances(host.broker(), endpoints, &result.record);
@@ -127,9 +78,9 @@ void floorOfInstances(benchmark::State& state) {
 }
 
 void enumerate(benchmark::State& state, const char* className) {
-    writeTree(state.range(0));
+    bench::setInterfaces(state.range(0));
     test::Host host;
-    CountingResult result;
+    bench::CountingResult result;
     for (auto _ : state) {
         host.request(cimom::broker::ResultCollector::Kind::instances, test::pathOf(className),
                      [&](auto* context, auto* /*collector*/, auto* path) {
@@ -185,17 +136,7 @@ void printRatios(const std::map<std::string, double>& nanoseconds) {
 }  // namespace
 
 int main(int argc, char** argv) {
-    std::array<char, 32> directory{"/tmp/provider-bench-XXXXXX"};
-    if (::mkdtemp(directory.data()) == nullptr) {
-        std::perror("mkdtemp");
-        return 1;
-    }
-    treeFile = std::string(directory.data()) + "/tree.json";
-    ::setenv("ZR_INSTRUMENTATION_TREE", treeFile.c_str(), 1);
-    ::setenv("ZR_LOG_SINK", "none", 1);
-    ::setenv("ZR_TRACE_SINK", "none", 1);
-    ::setenv("ZR_DATA_DIR", directory.data(), 1);
-
+    const bench::Machine machine;
     benchmark::RegisterBenchmark("discarded trace point", discardedTracePoint);
     benchmark::RegisterBenchmark("floor", floorOfInstances)->Arg(1)->Arg(100)->Arg(1000);
     for (const char* className : {"QVXZR_DHCPProtocolEndpoint", "QVXZR_DHCPCapabilities",
@@ -213,7 +154,5 @@ int main(int argc, char** argv) {
     RememberingReporter reporter;
     benchmark::RunSpecifiedBenchmarks(&reporter);
     printRatios(reporter.nanoseconds);
-    std::remove(treeFile.c_str());
-    ::rmdir(directory.data());
     return 0;
 }

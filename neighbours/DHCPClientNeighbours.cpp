@@ -1,5 +1,6 @@
 #include <cmpift.h>
 
+#include <algorithm>
 #include <atomic>
 #include <exception>
 #include <string>
@@ -29,39 +30,45 @@ std::string classNameOf(const CMPIObjectPath* path) {
     return text == nullptr ? "" : text;
 }
 
+/// Null when the broker refuses any part of it: an object with half its keys would
+/// be another one.
 CMPIObjectPath* makePath(const NeighbourObject& object, const std::string& nameSpace) {
     CMPIObjectPath* path =
         ProviderUtilities::createObjectPath(broker, object.className.c_str(), nameSpace);
-    for (const auto& [name, value] : object.keys) {
-        ProviderUtilities::setKeyProperty(path, name, value);
-    }
-    return path;
+    const bool complete =
+        std::all_of(object.keys.begin(), object.keys.end(), [path](const auto& key) {
+            return ProviderUtilities::setKeyProperty(path, key.first.c_str(), key.second);
+        });
+    return complete ? path : nullptr;
 }
 
+/// Sets one property; false when the broker refuses.
 struct PropertySetter {
     CMPIInstance* instance;
     const char* name;
 
-    void operator()(const std::string& text) const {
-        ProviderUtilities::setProperty(instance, name, text);
+    bool operator()(const std::string& text) const {
+        return ProviderUtilities::setProperty(instance, name, text);
     }
-    void operator()(unsigned short number) const {
-        ProviderUtilities::setProperty(instance, name, number);
+    bool operator()(unsigned short number) const {
+        return ProviderUtilities::setProperty(instance, name, number);
     }
-    void operator()(const std::vector<unsigned short>& numbers) const {
-        ProviderUtilities::setProperty(broker, instance, name, numbers);
+    bool operator()(const std::vector<unsigned short>& numbers) const {
+        return ProviderUtilities::setProperty(broker, instance, name, numbers);
     }
 };
 
+/// Null when the broker refuses any part of it.
 CMPIInstance* makeInstance(const NeighbourObject& object, const std::string& nameSpace) {
     CMPIInstance* instance = ProviderUtilities::createInstance(broker, makePath(object, nameSpace));
+    bool complete = instance != nullptr;
     for (const auto& [name, value] : object.keys) {
-        ProviderUtilities::setProperty(instance, name, value);
+        complete = complete && PropertySetter{instance, name.c_str()}(value);
     }
     for (const auto& [name, value] : object.properties) {
-        std::visit(PropertySetter{instance, name}, value);
+        complete = complete && std::visit(PropertySetter{instance, name.c_str()}, value);
     }
-    return instance;
+    return complete ? instance : nullptr;
 }
 
 /// Whether the object agrees with every text key of the path.

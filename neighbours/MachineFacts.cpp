@@ -24,8 +24,8 @@ bool isServiceProcessor(const Instrumentation& system) {
 /// The computer two levels above an interface.
 Instrumentation systemOf(const Instrumentation& interface) {
     Instrumentation node;
-    node.selectNode(interface.getPathToParentNode());
-    node.selectNode(node.getPathToParentNode());
+    node.selectParentOf(interface);
+    node.selectParentOf(node);
     return node;
 }
 

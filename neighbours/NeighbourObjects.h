@@ -14,12 +14,14 @@ using PropertyValue = std::variant<std::string, unsigned short, std::vector<unsi
 
 struct NeighbourObject {
     std::string className;
-    std::vector<std::pair<const char*, std::string>> keys;
-    std::vector<std::pair<const char*, PropertyValue>> properties;  ///< beside the keys
+    std::vector<std::pair<std::string, std::string>> keys;
+    std::vector<std::pair<std::string, PropertyValue>> properties;  ///< beside the keys
 
     /// The value of a key; null when there is no such key. Names compare without
     /// regard to case.
     [[nodiscard]] const std::string* key(const std::string& name) const;
+
+    bool operator==(const NeighbourObject&) const = default;
 };
 
 /// Whether a class is one of the four. Names compare without regard to case.

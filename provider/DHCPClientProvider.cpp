@@ -30,10 +30,10 @@ const TraceSource source{"DHCPClientProvider", loggerDHCPClientProvider};
 
 /// What one request hands to the walk that answers it.
 struct Request {
-    const CMPIContext* context;
-    const CMPIResult* result;
-    const CMPIObjectPath* path;
-    const char** properties;
+    const CMPIContext* context = nullptr;
+    const CMPIResult* result = nullptr;
+    const CMPIObjectPath* path = nullptr;
+    const char** properties = nullptr;
     TracePoint at;
 };
 

@@ -3,6 +3,7 @@
 #include <CLI/CLI.hpp>
 #include <map>
 #include <memory>
+#include <stdexcept>
 
 #include "cimdhcp/DisplayText.h"
 #include "cimdhcp/Failure.h"
@@ -30,6 +31,8 @@ Examples:
   cimdhcp get 'QVXZR_DHCPSettingData.InstanceID="Computer%eth0"'
   cimdhcp --format json associators --names 'QVXZR_DHCPCapabilities.InstanceID="eth0"'
   cimdhcp --tree machine.json show
+  cimdhcp serve
+  cimdhcp user add --users users --modify admin
 
 Exit status:
   0  done
@@ -48,6 +51,8 @@ before or behind the command.)";
 constexpr const char* machineGroup = "The machine";
 constexpr const char* classGroup = "Classes and instances";
 constexpr const char* associationGroup = "Associations";
+constexpr const char* serverGroup = "The WBEM server";
+constexpr const char* limitGroup = "Limits of what a client may cost; none can be switched off";
 constexpr const char* advancedGroup = "Advanced options";
 
 /// The options of a command line while they are being read.
@@ -65,6 +70,7 @@ class Reader {
         addMachineCommands();
         addInstanceCommands();
         addAssociationCommands();
+        addServerCommands();
         // Commands made after this would take the footer over.
         app_.footer(std::string(pathHelp) + '\n' + footer);
     }
@@ -212,6 +218,73 @@ class Reader {
                   "Only where PATH stands in this reference");
     }
 
+    void addServerCommands() {
+        CLI::App* const serve =
+            command("serve", serverGroup, "Answer WBEM clients: CIM-XML over HTTP", serve_);
+        command("check", serverGroup, "Tell why something is empty or does not work", check_);
+        addServeOptions(serve);
+        addLimits(serve);
+        CLI::App* const user = app_.add_subcommand("user", "The users of the server");
+        user->group(serverGroup)->require_subcommand(1);
+        CLI::App* const add = user->add_subcommand(
+            "add",
+            "Add a user, or change role and password.\nThe password is asked for, or read from "
+            "standard input.");
+        add->callback([this] { line_.command = userAdd_; });
+        add->add_option("NAME", userAdd_.name, "The user")->required();
+        add->add_option("--users", userAdd_.users, "The users file; made if there is none")
+            ->type_name("FILE")
+            ->required();
+        add->add_flag("--modify", userAdd_.mayModify, "The user may modify, not only read");
+    }
+
+    void addServeOptions(CLI::App* serve) {
+        serve
+            ->add_option("--listen", serve_.listen,
+                         "Where to listen; 127.0.0.1 if nothing is said. Any address that other "
+                         "machines reach needs TLS and users")
+            ->type_name("ADDRESS[:PORT]");
+        addFilter(serve, "--tls-cert", serve_.tlsCertificate, "FILE",
+                  "The certificate with its chain (PEM); the port is then 5989");
+        addFilter(serve, "--tls-key", serve_.tlsKey, "FILE", "Its private key (PEM)");
+        addFilter(serve, "--users", serve_.users, "FILE",
+                  "Only these users, made by \"cimdhcp user add\"");
+        serve->add_flag("--read-only", serve_.readOnly, "Nobody may modify");
+    }
+
+    void addLimits(CLI::App* serve) {
+        cimom::wbem::Limits& limits = serve_.limits;
+        const auto number = [serve](const char* option, std::size_t& value, const char* text) {
+            serve->add_option(option, value, text)->type_name("N")->group(limitGroup);
+        };
+        const auto seconds = [serve](const char* option, std::chrono::seconds& value,
+                                     const char* text) {
+            serve
+                ->add_option_function<std::uint32_t>(
+                    option,
+                    [&value](const std::uint32_t& given) { value = std::chrono::seconds(given); },
+                    text)
+                ->type_name("SECONDS")
+                ->group(limitGroup);
+        };
+        number("--max-header-line", limits.headerLine, "Bytes of one header (8192)");
+        number("--max-headers", limits.headers, "Bytes of all headers (16384)");
+        number("--max-body", limits.body, "Bytes of a request (1048576)");
+        number("--max-depth", limits.depth, "Depth of a request's XML (64)");
+        number("--max-connections", limits.connections, "Open connections (512)");
+        number("--max-waiting", limits.waiting, "Requests that wait for a worker (256)");
+        number("--max-enumerations", limits.sessions.sessions, "Open enumerations (64)");
+        number("--workers", limits.workers, "Operations at the same time (4)");
+        number("--io-threads", limits.ioThreads, "Threads that read and send (2)");
+        seconds("--request-timeout", limits.request,
+                "For a request to arrive, and again for its operation (30)");
+        seconds("--answer-timeout", limits.answer, "For a client to take its answer (300)");
+        seconds("--enumeration-timeout", limits.sessions.defaultTimeout,
+                "Silence after which an open enumeration is forgotten (60)");
+        seconds("--max-enumeration-timeout", limits.sessions.longestTimeout,
+                "The longest such silence that a client may ask for (600)");
+    }
+
     static void addPath(CLI::App* app, std::string& path) {
         app->add_option("PATH", path, "The instance")->required();
         app->footer(pathHelp);
@@ -241,6 +314,13 @@ class Reader {
                           "a graph has no JSON output; it is in Graphviz' language, or with --svg "
                           "drawn");
         }
+        if (const auto* const serve = std::get_if<ServeCommand>(&line_.command)) {
+            try {
+                serve->limits.check();
+            } catch (const std::invalid_argument& error) {
+                throw Failure(ExitStatus::usage, std::string("--") + error.what());
+            }
+        }
         if (options.format == Format::mof && !hasMofForm()) {
             throw Failure(ExitStatus::usage,
                           "this command has no MOF output; use --format table or json");
@@ -252,7 +332,10 @@ class Reader {
                !std::holds_alternative<RenameCommand>(line_.command) &&
                !std::holds_alternative<GraphCommand>(line_.command) &&
                !std::holds_alternative<TreeCommand>(line_.command) &&
-               !std::holds_alternative<ClassesCommand>(line_.command);
+               !std::holds_alternative<ClassesCommand>(line_.command) &&
+               !std::holds_alternative<ServeCommand>(line_.command) &&
+               !std::holds_alternative<UserAddCommand>(line_.command) &&
+               !std::holds_alternative<CheckCommand>(line_.command);
     }
 
     CommandLine line_;
@@ -267,6 +350,9 @@ class Reader {
     ModifyCommand modify_;
     AssociatorsCommand associators_;
     ReferencesCommand references_;
+    ServeCommand serve_;
+    UserAddCommand userAdd_;
+    CheckCommand check_;
     CLI::App app_;
 };
 

@@ -5,6 +5,7 @@
 #include <type_traits>
 #include <variant>
 
+#include "cimdhcp/Check.h"
 #include "cimdhcp/CimCommands.h"
 #include "cimdhcp/ClassList.h"
 #include "cimdhcp/Client.h"
@@ -19,7 +20,9 @@
 #include "cimdhcp/Overview.h"
 #include "cimdhcp/PlatformSetup.h"
 #include "cimdhcp/Rename.h"
+#include "cimdhcp/Serve.h"
 #include "cimdhcp/TableFormat.h"
+#include "cimdhcp/UserAdd.h"
 #include "zrclient/InstrumentationService.h"
 #include "zrclient/LiveSource.h"
 #include "zrclient/SnapshotJson.h"
@@ -78,6 +81,23 @@ class Execution {
         outputs_.out << (json() ? classJson(classes) : classTable(classes, outputs_.width));
     }
 
+    void operator()(const ServeCommand& command) const {
+        Client client = openClient();
+        serve(command, client, outputs_.out);
+    }
+
+    void operator()(const CheckCommand& /*command*/) const {
+        const auto findings = check(options_, installations(executableFile()));
+        outputs_.out << (json() ? checkJson(findings) : checkText(findings));
+        if (!isGood(findings)) {
+            throw Failure(ExitStatus::notDone, "something is wrong, as the list tells");
+        }
+    }
+
+    void operator()(const UserAddCommand& command) const {
+        addUser(command, outputs_.out, outputs_.err);
+    }
+
     template <typename CimCommand>
     void operator()(const CimCommand& command) const {
         Client client = openClient();
@@ -120,7 +140,12 @@ void runCommand(const std::vector<std::string>& arguments, const Outputs& output
         outputs.out << information->text;
     } else {
         const auto& line = std::get<CommandLine>(parsed);
-        setUpPlatform(line.options, outputs.err);
+        // Who may use the server has nothing to do with the machine; the check does
+        // this itself, and goes on when it fails.
+        if (!std::holds_alternative<UserAddCommand>(line.command) &&
+            !std::holds_alternative<CheckCommand>(line.command)) {
+            setUpPlatform(line.options, outputs.err);
+        }
         std::visit(Execution(line.options, outputs), line.command);
     }
 }

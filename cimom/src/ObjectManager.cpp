@@ -138,6 +138,14 @@ const std::vector<Registration>& ObjectManager::registrations() const noexcept {
     return implementation_->registrations();
 }
 
+const std::vector<std::string>& ObjectManager::nameSpaces() const noexcept {
+    return implementation_->nameSpaces();
+}
+
+const std::string& ObjectManager::host() const noexcept {
+    return implementation_->host();
+}
+
 PathsResult ObjectManager::enumerateInstanceNames(const ObjectPath& path,
                                                   const InstanceRequest& request) {
     return implementation_->enumerateInstanceNames(path, request);

@@ -31,6 +31,10 @@ class ObjectManager::Implementation {
     [[nodiscard]] const std::vector<Registration>& registrations() const noexcept {
         return registrations_;
     }
+    [[nodiscard]] const std::vector<std::string>& nameSpaces() const noexcept {
+        return nameSpaces_;
+    }
+    [[nodiscard]] const std::string& host() const noexcept { return configuration_.host; }
 
     PathsResult enumerateInstanceNames(ObjectPath path, const InstanceRequest& request);
     InstancesResult enumerateInstances(ObjectPath path, const InstanceRequest& request);

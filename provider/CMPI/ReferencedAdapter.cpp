@@ -4,27 +4,26 @@
 
 namespace ZR::DHCPClientProvider {
 
-CMPIEnumeration* enumerateReferenced(const CMPIBroker* broker, const CMPIContext* context,
+CMPIEnumeration* enumerateReferenced(const CMPIBroker* mb, const CMPIContext* context,
                                      const CMPIObjectPath* path, const char* message) {
-    if (broker == nullptr || path == nullptr) {
+    if (mb == nullptr || path == nullptr) {
         throw ProviderException(message);
     }
     CMPIStatus status{CMPI_RC_OK, nullptr};
-    CMPIEnumeration* enumeration =
-        broker->bft->enumerateInstances(broker, context, path, nullptr, &status);
+    CMPIEnumeration* enumeration = mb->bft->enumerateInstances(mb, context, path, nullptr, &status);
     if (status.rc != CMPI_RC_OK) {
         throw ProviderException(message);
     }
     return enumeration;
 }
 
-CMPIInstance* getReferenced(const CMPIBroker* broker, const CMPIContext* context,
+CMPIInstance* getReferenced(const CMPIBroker* mb, const CMPIContext* context,
                             const CMPIObjectPath* path) {
-    if (broker == nullptr || path == nullptr) {
+    if (mb == nullptr || path == nullptr) {
         throw ProviderException(noComputerSystem);
     }
     CMPIStatus status{CMPI_RC_OK, nullptr};
-    CMPIInstance* instance = broker->bft->getInstance(broker, context, path, nullptr, &status);
+    CMPIInstance* instance = mb->bft->getInstance(mb, context, path, nullptr, &status);
     if (status.rc != CMPI_RC_OK) {
         throw ProviderException(noComputerSystem);
     }

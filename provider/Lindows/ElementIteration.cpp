@@ -11,8 +11,8 @@ namespace ZR::DHCPClientProvider {
 std::string readSystemDescription(const Instrumentation& cursor, const TracePoint& at,
                                   const char* variable) {
     Instrumentation system;
-    system.selectNode(cursor.getPathToParentNode());
-    system.selectNode(system.getPathToParentNode());
+    system.selectParentOf(cursor);
+    system.selectParentOf(system);
     std::string description;
     system.getNodeDescription(description);
     traceVariable(at, variable, description);
@@ -25,7 +25,7 @@ const char* systemClassOf(const std::string& systemDescription) {
 }
 
 bool readHostName(std::string& name, const TracePoint& at) {
-    std::array<char, hostNameBufferSize> buffer{};
+    std::array<char, hostNameBufferSize> buffer;  // NOLINT(cppcoreguidelines-pro-type-member-init)
     if (::gethostname(buffer.data(), buffer.size()) == -1) {
         traceMessage(at, "gethostname Failed");
         return false;

@@ -64,7 +64,7 @@ struct Argument {
     std::string_view text;
 };
 
-/// Copies `size` bytes as a run of blocks and a last block that overlaps the run.
+/// Copies at least `block` bytes as a run of blocks and a last block that overlaps the run.
 template <std::size_t block>
 inline void copyBlocks(char* out, const char* in, std::size_t size) {
     for (std::size_t done = 0; done + block < size; done += block) {
@@ -78,6 +78,8 @@ inline void copyBlocks(char* out, const char* in, std::size_t size) {
 inline void copyShort(char* out, const char* in, std::size_t size) {
     if (size >= 16) {
         copyBlocks<16>(out, in, size);
+    } else if (size >= 8) {
+        copyBlocks<8>(out, in, size);
     } else if (size >= 4) {
         copyBlocks<4>(out, in, size);
     } else {

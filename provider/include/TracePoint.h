@@ -64,10 +64,8 @@ void writeLine(const TracePoint& at, int level, const Text& text) {
         TKLog::TKLogger::logLevelMessage(at.source.file.data(), at.function.data(), at.line,
                                          at.source.logger, level, nullptr, 0, 0, line.str());
     }
-    TKLog::TKMessageBuffer line;
-    line << text();
     TKLog::TKLogger::traceLevelMessage(at.source.file.data(), at.function.data(), at.line,
-                                       at.source.logger, level, nullptr, 0, 0, line.str());
+                                       at.source.logger, level, nullptr, 0, 0, text());
 }
 
 /// VARIABLE lines.

@@ -109,10 +109,38 @@ TEST_F(CommandLineText, ATreeMayBeExplained) {
     EXPECT_EQ(line({"tree", "--explain"}).command, Command(TreeCommand{true}));
 }
 
+TEST_F(CommandLineText, ReadsTheCommandsOfTheServer) {
+    EXPECT_EQ(line({"serve"}).command, Command(ServeCommand()));
+    ServeCommand serve;
+    serve.listen = "0.0.0.0:5989";
+    serve.tlsCertificate = "c";
+    serve.tlsKey = "k";
+    serve.users = "u";
+    serve.readOnly = true;
+    serve.limits.body = 5;
+    serve.limits.request = std::chrono::seconds(7);
+    serve.limits.sessions.sessions = 9;
+    EXPECT_EQ(line({"serve", "--listen", "0.0.0.0:5989", "--tls-cert", "c", "--tls-key", "k",
+                    "--users", "u", "--read-only", "--max-body", "5", "--request-timeout", "7",
+                    "--max-enumerations", "9"})
+                  .command,
+              Command(serve));
+    EXPECT_EQ(line({"user", "add", "--users", "f", "ada"}).command,
+              Command(UserAddCommand{"ada", "f", false}));
+    EXPECT_EQ(line({"user", "add", "--modify", "--users", "f", "ada"}).command,
+              Command(UserAddCommand{"ada", "f", true}));
+    EXPECT_EQ(line({"check"}).command, Command(CheckCommand()));
+}
+
 TEST_F(CommandLineText, TellsWhatIsWrong) {
     const std::string hint = " (\"cimdhcp --help\" tells more)";
     EXPECT_EQ(refusal({}), "a command is missing" + hint);
-    EXPECT_EQ(refusal({"serve"}), "there is no command \"serve\"" + hint);
+    EXPECT_EQ(refusal({"server"}), "there is no command \"server\"" + hint);
+    EXPECT_NE(refusal({"user"}), "accepted");
+    EXPECT_NE(refusal({"user", "add", "ada"}), "accepted");
+    EXPECT_NE(refusal({"serve", "--max-body", "-1"}), "accepted");
+    EXPECT_EQ(refusal({"serve", "--max-body", "0"}), "--max-body is 0; it may be 1 to 1073741824");
+    EXPECT_NE(refusal({"serve", "--request-timeout", "x"}), "accepted");
     EXPECT_EQ(refusal({"show", "eth0"}), "The following argument was not expected: eth0" + hint);
     EXPECT_EQ(refusal({"--connect", "x", "show"}).substr(0, 37),
               "The following arguments were not expe");
@@ -131,7 +159,7 @@ TEST_F(CommandLineText, TellsWhatIsWrong) {
 TEST_F(CommandLineText, HasMofForInstancesAlone) {
     const std::string refused = "this command has no MOF output; use --format table or json";
     for (const auto& command : std::vector<std::vector<std::string>>{
-             {"show"}, {"classes"}, {"tree"}, {"rename", "eth0", "x"}}) {
+             {"show"}, {"classes"}, {"tree"}, {"rename", "eth0", "x"}, {"serve"}, {"check"}}) {
         auto arguments = command;
         arguments.insert(arguments.begin(), {"--format", "mof"});
         EXPECT_EQ(refusal(arguments), refused) << command.front();
@@ -151,6 +179,9 @@ TEST_F(CommandLineText, HelpNamesEveryCommandAndOption) {
                              "modify PATH PROPERTY=VALUE...",
                              "associators PATH",
                              "references PATH",
+                             "serve ",
+                             "check ",
+                             "user ",
                              "--tree FILE",
                              "--data-dir DIR",
                              "--namespace NS",

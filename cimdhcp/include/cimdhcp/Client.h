@@ -22,6 +22,8 @@ class Client {
     [[nodiscard]] const cimom::ClassRepository& repository() const noexcept;
     [[nodiscard]] const std::vector<cimom::Registration>& registrations() const noexcept;
 
+    [[nodiscard]] cimom::ObjectManager& manager() noexcept { return *manager_; }
+
     /// The namespace of paths that name none.
     [[nodiscard]] const std::string& nameSpace() const noexcept { return nameSpace_; }
 

@@ -6,6 +6,8 @@
 #include <variant>
 #include <vector>
 
+#include "wbem/Limits.h"
+
 namespace cimdhcp {
 
 enum class Format : std::uint8_t { table, mof, json };
@@ -86,9 +88,31 @@ struct ReferencesCommand {
     bool operator==(const ReferencesCommand&) const = default;
 };
 
-using Command = std::variant<ShowCommand, RenameCommand, GraphCommand, TreeCommand, ClassesCommand,
-                             NamesCommand, InstancesCommand, GetCommand, ModifyCommand,
-                             AssociatorsCommand, ReferencesCommand>;
+struct ServeCommand {
+    std::string listen = "127.0.0.1";  ///< ADDRESS, ADDRESS:PORT or [ADDRESS]:PORT
+    std::optional<std::string> tlsCertificate;
+    std::optional<std::string> tlsKey;
+    std::optional<std::string> users;
+    bool readOnly = false;
+    cimom::wbem::Limits limits;
+
+    bool operator==(const ServeCommand&) const = default;
+};
+struct UserAddCommand {
+    std::string name;
+    std::string users;  ///< the users file
+    bool mayModify = false;
+
+    bool operator==(const UserAddCommand&) const = default;
+};
+struct CheckCommand {
+    bool operator==(const CheckCommand&) const = default;
+};
+
+using Command =
+    std::variant<ShowCommand, RenameCommand, GraphCommand, TreeCommand, ClassesCommand,
+                 NamesCommand, InstancesCommand, GetCommand, ModifyCommand, AssociatorsCommand,
+                 ReferencesCommand, ServeCommand, UserAddCommand, CheckCommand>;
 
 struct CommandLine {
     Options options;

@@ -86,6 +86,10 @@ class ObjectManager {
 
     [[nodiscard]] const ClassRepository& repository() const noexcept;
     [[nodiscard]] const std::vector<Registration>& registrations() const noexcept;
+    /// The namespaces that the registrations name, each once, in their order.
+    [[nodiscard]] const std::vector<std::string>& nameSpaces() const noexcept;
+    /// The host of full paths.
+    [[nodiscard]] const std::string& host() const noexcept;
 
     // Instances. The class of the path may be a served class or a parent of one:
     // every served class at or below it is asked, in the order of the repository.

@@ -1,6 +1,7 @@
 #include "zrclient/Instrumentation.h"
 
 #include <limits>
+#include <utility>
 #include <variant>
 
 #include "zrclient/InstrumentationService.h"
@@ -32,6 +33,20 @@ bool Instrumentation::selectNode(const std::string& path) {
     snapshot_ = InstrumentationService::process().latest();
     walksType_ = false;
     stand(snapshot_->resolve(path));
+    return node_ != Snapshot::none;
+}
+
+bool Instrumentation::selectParentOf(const Instrumentation& other) {
+    auto latest = InstrumentationService::process().latest();
+    Snapshot::Index parent = Snapshot::none;
+    if (latest == other.snapshot_) {
+        parent = other.node_ == Snapshot::none ? other.node_ : latest->node(other.node_).parent;
+    } else {
+        parent = latest->resolve(other.getPathToParentNode());
+    }
+    snapshot_ = std::move(latest);
+    walksType_ = false;
+    stand(parent);
     return node_ != Snapshot::none;
 }
 

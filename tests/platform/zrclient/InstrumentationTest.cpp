@@ -211,6 +211,56 @@ TEST_F(InstrumentationTest, ClimbsToParentAndGrandparent) {
     EXPECT_EQ(name(cursor), "eth0");
 }
 
+TEST_F(InstrumentationTest, ParentIsSelectedAsByItsPath) {
+    for (const char* path : {"/testhost/Network/eth0", "/testhost/Network", "/BMC:-1/bmc0"}) {
+        const Instrumentation cursor = on(path);
+        Instrumentation above;
+        Instrumentation byPath;
+        EXPECT_EQ(above.selectParentOf(cursor), byPath.selectNode(cursor.getPathToParentNode()));
+        std::string description = "none";
+        std::string descriptionByPath = "none";
+        above.getNodeDescription(description);
+        byPath.getNodeDescription(descriptionByPath);
+        EXPECT_EQ(description, descriptionByPath) << path;
+        EXPECT_EQ(above.getPathToParentNode(), byPath.getPathToParentNode()) << path;
+        EXPECT_FALSE(++above) << "as after any path";
+    }
+}
+
+TEST_F(InstrumentationTest, RootAndNothingHaveNoParentToSelect) {
+    Instrumentation cursor = on("/testhost");
+    EXPECT_FALSE(cursor.selectParentOf(cursor));
+    EXPECT_FALSE(cursor.selectParentOf(cursor)) << "it stands on nothing now";
+    EXPECT_FALSE(cursor.selectParentOf(Instrumentation()));
+}
+
+TEST_F(InstrumentationTest, ParentIsSelectedInTheLatestSnapshot) {
+    Instrumentation cursor;
+    ASSERT_TRUE(cursor.selectNode(NodeType::NetworkInterface));
+    show(R"({"nodes": [{"type": "ComputerSystem", "description": "x", "properties":
+        {"Name": "testhost"}, "children": [{"type": "Network", "description": "Network",
+        "children": []}, {"type": "Network", "description": "other"}]}]})");
+    EXPECT_EQ(walk(NodeType::ComputerSystem), (std::vector<std::string>{"testhost"}));
+    Instrumentation above;
+    ASSERT_TRUE(above.selectParentOf(cursor));
+    EXPECT_EQ(above.getPathToParentNode(), "/testhost");
+    ASSERT_TRUE(above.selectParentOf(above));
+    std::string description;
+    EXPECT_TRUE(above.getNodeDescription(description));
+    EXPECT_EQ(description, "x") << "of the new snapshot";
+    show(R"({"nodes": []})");
+    EXPECT_THAT(walk(NodeType::ComputerSystem), IsEmpty());
+    EXPECT_FALSE(above.selectParentOf(cursor)) << "there is no such node any more";
+}
+
+TEST_F(InstrumentationTest, SelectingAParentIsOneVisit) {
+    const Instrumentation cursor = on("/testhost/Network/eth0");
+    Instrumentation above;
+    const std::uint64_t before = Instrumentation::nodeVisits();
+    EXPECT_TRUE(above.selectParentOf(cursor));
+    EXPECT_EQ(Instrumentation::nodeVisits(), before + 1);
+}
+
 TEST_F(InstrumentationTest, AnAbsentDescriptionIsEmpty) {
     std::string description = "full";
     EXPECT_TRUE(on("/BMC:-1/bmc0").getNodeDescription(description));

@@ -2,8 +2,7 @@
 
 #include <deque>
 #include <numeric>
-
-#include "include/Exceptions.h"
+#include <stdexcept>
 
 namespace test {
 
@@ -76,8 +75,14 @@ CMPIEnumeration* wrap(const CMPIEnumeration* real) {
 
 /// The object behind a stand-in.
 template <typename Object>
+Object* realOf(const Object* standIn) {
+    return static_cast<Object*>(standIn->hdl);
+}
+
+/// The same of one that may be null.
+template <typename Object>
 Object* behind(const Object* standIn) {
-    return standIn == nullptr ? nullptr : static_cast<Object*>(standIn->hdl);
+    return standIn == nullptr ? nullptr : realOf(standIn);
 }
 
 CMPIValue behind(const CMPIValue& value, CMPIType type) {
@@ -123,7 +128,7 @@ bool failsNow(Function function) {
     }
     state.deliveredBeforeFault = delivered;
     if (state.fault == Fault::exception) {
-        throw ZR::ProviderException("a function of the broker threw");
+        throw std::runtime_error("a function of the broker threw");
     }
     return true;
 }
@@ -210,30 +215,30 @@ CMPIInstance* getInstance(const CMPIBroker* /*mb*/, const CMPIContext* context,
 
 CMPIString* getNameSpace(const CMPIObjectPath* self, CMPIStatus* rc) {
     return call(Function::getNameSpace, rc, nothing<CMPIString>,
-                [&] { return wrap(behind(self)->ft->getNameSpace(behind(self), rc)); });
+                [&] { return wrap(realOf(self)->ft->getNameSpace(realOf(self), rc)); });
 }
 
 CMPIString* getClassName(const CMPIObjectPath* self, CMPIStatus* rc) {
     return call(Function::getClassName, rc, nothing<CMPIString>,
-                [&] { return wrap(behind(self)->ft->getClassName(behind(self), rc)); });
+                [&] { return wrap(realOf(self)->ft->getClassName(realOf(self), rc)); });
 }
 
 CMPIStatus addKey(const CMPIObjectPath* self, const char* name, const CMPIValue* value,
                   const CMPIType type) {
     return call(Function::addKey, [&] {
         const CMPIValue real = behind(*value, type);
-        return behind(self)->ft->addKey(behind(self), name, &real, type);
+        return realOf(self)->ft->addKey(realOf(self), name, &real, type);
     });
 }
 
 CMPIData getKey(const CMPIObjectPath* self, const char* name, CMPIStatus* rc) {
     return call(Function::getKey, rc, faultData(),
-                [&] { return wrap(behind(self)->ft->getKey(behind(self), name, rc)); });
+                [&] { return wrap(realOf(self)->ft->getKey(realOf(self), name, rc)); });
 }
 
 CMPIData getKeyAt(const CMPIObjectPath* self, CMPICount index, CMPIString** name, CMPIStatus* rc) {
     return call(Function::getKeyAt, rc, faultData(), [&] {
-        const CMPIData data = behind(self)->ft->getKeyAt(behind(self), index, name, rc);
+        const CMPIData data = realOf(self)->ft->getKeyAt(realOf(self), index, name, rc);
         if (name != nullptr) {
             *name = wrap(*name);
         }
@@ -243,73 +248,73 @@ CMPIData getKeyAt(const CMPIObjectPath* self, CMPICount index, CMPIString** name
 
 CMPICount getKeyCount(const CMPIObjectPath* self, CMPIStatus* rc) {
     return call(Function::getKeyCount, rc, CMPICount{0},
-                [&] { return behind(self)->ft->getKeyCount(behind(self), rc); });
+                [&] { return realOf(self)->ft->getKeyCount(realOf(self), rc); });
 }
 
 CMPIString* toString(const CMPIObjectPath* self, CMPIStatus* rc) {
     return call(Function::toString, rc, nothing<CMPIString>,
-                [&] { return wrap(behind(self)->ft->toString(behind(self), rc)); });
+                [&] { return wrap(realOf(self)->ft->toString(realOf(self), rc)); });
 }
 
 // Instances.
 
 CMPIData getProperty(const CMPIInstance* self, const char* name, CMPIStatus* rc) {
     return call(Function::getProperty, rc, faultData(),
-                [&] { return wrap(behind(self)->ft->getProperty(behind(self), name, rc)); });
+                [&] { return wrap(realOf(self)->ft->getProperty(realOf(self), name, rc)); });
 }
 
 CMPIStatus setProperty(const CMPIInstance* self, const char* name, const CMPIValue* value,
                        CMPIType type) {
     return call(Function::setProperty, [&] {
         const CMPIValue real = behind(*value, type);
-        return behind(self)->ft->setProperty(behind(self), name, &real, type);
+        return realOf(self)->ft->setProperty(realOf(self), name, &real, type);
     });
 }
 
 CMPIObjectPath* getObjectPath(const CMPIInstance* self, CMPIStatus* rc) {
     return call(Function::getObjectPath, rc, nothing<CMPIObjectPath>,
-                [&] { return wrap(behind(self)->ft->getObjectPath(behind(self), rc)); });
+                [&] { return wrap(realOf(self)->ft->getObjectPath(realOf(self), rc)); });
 }
 
 // Strings, arrays, enumerations.
 
 const char* getCharPtr(const CMPIString* self, CMPIStatus* rc) {
     return call(Function::getCharPtr, rc, nothing<const char>,
-                [&] { return behind(self)->ft->getCharPtr(behind(self), rc); });
+                [&] { return realOf(self)->ft->getCharPtr(realOf(self), rc); });
 }
 
 CMPIStatus setElementAt(const CMPIArray* self, CMPICount index, const CMPIValue* value,
                         CMPIType type) {
     return call(Function::setElementAt, [&] {
         const CMPIValue real = behind(*value, type);
-        return behind(self)->ft->setElementAt(behind(self), index, &real, type);
+        return realOf(self)->ft->setElementAt(realOf(self), index, &real, type);
     });
 }
 
 CMPIBoolean hasNext(const CMPIEnumeration* self, CMPIStatus* rc) {
     return call(Function::hasNext, rc, CMPIBoolean{0},
-                [&] { return behind(self)->ft->hasNext(behind(self), rc); });
+                [&] { return realOf(self)->ft->hasNext(realOf(self), rc); });
 }
 
 CMPIData getNext(const CMPIEnumeration* self, CMPIStatus* rc) {
     return call(Function::getNext, rc, faultData(),
-                [&] { return wrap(behind(self)->ft->getNext(behind(self), rc)); });
+                [&] { return wrap(realOf(self)->ft->getNext(realOf(self), rc)); });
 }
 
 // Results.
 
 CMPIStatus returnInstance(const CMPIResult* self, const CMPIInstance* instance) {
     return call(Function::returnInstance,
-                [&] { return behind(self)->ft->returnInstance(behind(self), behind(instance)); });
+                [&] { return realOf(self)->ft->returnInstance(realOf(self), behind(instance)); });
 }
 
 CMPIStatus returnObjectPath(const CMPIResult* self, const CMPIObjectPath* path) {
     return call(Function::returnObjectPath,
-                [&] { return behind(self)->ft->returnObjectPath(behind(self), behind(path)); });
+                [&] { return realOf(self)->ft->returnObjectPath(realOf(self), behind(path)); });
 }
 
 CMPIStatus returnDone(const CMPIResult* self) {
-    return call(Function::returnDone, [&] { return behind(self)->ft->returnDone(behind(self)); });
+    return call(Function::returnDone, [&] { return realOf(self)->ft->returnDone(realOf(self)); });
 }
 
 constexpr int version = 200;

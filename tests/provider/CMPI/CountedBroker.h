@@ -52,7 +52,7 @@ enum class Fault {
     none,
     null,       ///< answers nothing (a null pointer, no value, 0), with status OK
     status,     ///< answers nothing, with an error status
-    exception,  ///< throws ZR::ProviderException, as the provider's own code might
+    exception,  ///< throws a standard exception, as C++ behind a table might
 };
 
 /// Whether a function can answer nothing while its status is OK: one that answers a

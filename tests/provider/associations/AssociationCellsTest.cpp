@@ -18,6 +18,7 @@
 namespace {
 
 using test::briefs;
+using test::endPath;
 using test::Host;
 using test::ofHost;
 using test::pathFrom;
@@ -29,7 +30,7 @@ constexpr const char* nothingToDeliver = "The broker made no object; it is left 
 struct Cell {
     const char* name;
     const char* association;
-    const char* source;
+    std::string source;
     Texts associators;
     Texts references;
     unsigned steps = 0;             ///< of an associator walk that yields nothing
@@ -94,21 +95,13 @@ TEST_P(AssociationCells, References) {
 
 // Sources.
 
-constexpr const char* computer =
-    R"(QVXZR_ComputerSystem.CreationClassName="QVXZR_ComputerSystem",Name="@")";
-constexpr const char* eth1 =
-    R"(QVXZR_DHCPProtocolEndpoint.SystemCreationClassName="QVXZR_ComputerSystem",)"
-    R"(SystemName="@",CreationClassName="QVXZR_DHCPProtocolEndpoint",Name="eth1")";
-constexpr const char* ipEth1 =
-    R"(QVXZR_IPProtocolEndpoint.SystemCreationClassName="QVXZR_ComputerSystem",)"
-    R"(SystemName="@",CreationClassName="QVXZR_IPProtocolEndpoint",Name="eth1")";
-constexpr const char* server =
-    R"(QVXZR_DHCPRemoteServiceAccessPoint.SystemCreationClassName="QVXZR_ComputerSystem",)"
-    R"(SystemName="@",CreationClassName="QVXZR_DHCPRemoteServiceAccessPoint",Name="eth1_IPv6")";
-constexpr const char* capabilities = R"(QVXZR_DHCPCapabilities.InstanceID="eth1")";
-constexpr const char* setting = R"(QVXZR_DHCPSettingData.InstanceID="Computer%eth1")";
-constexpr const char* assignment =
-    R"(QVXZR_IPAssignmentSettingData.InstanceID="Computer%eth1%dhcp")";
+const std::string computer = endPath("QVXZR_ComputerSystem", "eth1");
+const std::string eth1 = endPath("QVXZR_DHCPProtocolEndpoint", "eth1");
+const std::string ipEth1 = endPath("QVXZR_IPProtocolEndpoint", "eth1");
+const std::string server = endPath("QVXZR_DHCPRemoteServiceAccessPoint", "eth1");
+const std::string capabilities = endPath("QVXZR_DHCPCapabilities", "eth1");
+const std::string setting = endPath("QVXZR_DHCPSettingData", "eth1");
+const std::string assignment = endPath("QVXZR_IPAssignmentSettingData", "eth1");
 constexpr const char* keylessComputer = "QVXZR_ComputerSystem";
 constexpr const char* keylessEndpoint = "QVXZR_DHCPProtocolEndpoint";
 constexpr const char* keylessIPEndpoint = "QVXZR_IPProtocolEndpoint";

@@ -14,6 +14,7 @@
 namespace {
 
 using test::briefs;
+using test::Fault;
 using test::Function;
 using test::host;
 using test::Host;
@@ -390,6 +391,30 @@ TEST_F(AssociationsTest, MissingAssignmentFailsWithTheComputersMessageAndStaysOk
     ASSERT_THAT(log.log(), SizeIs(1));
     EXPECT_THAT(log.log()[0].message,
                 ::testing::EndsWith("Could not obtain an instance of Computer System"));
+}
+
+// Ends that cannot be found or named.
+
+TEST_F(AssociationsTest, FarEndThatCannotBecomeAPathCoversEveryInstance) {
+    // The first path is the one without keys, which then stays.
+    host_.counted().fail(Function::newObjectPath, 2, Fault::null);
+    EXPECT_EQ(briefs(host_.associatorNames(endpoint("eth1"), "QVXZR_DHCPElementCapabilities")),
+              (Texts{"DHCPCapabilities eth0", "DHCPCapabilities eth1", "DHCPCapabilities eth2",
+                     "DHCPCapabilities bmc0"}));
+}
+
+TEST_F(AssociationsTest, EndWithoutAPathLeavesItsReferenceOut) {
+    host_.counted().fail(Function::enumerateInstances, 1, Fault::null);
+    EXPECT_EQ(briefs(host_.enumerateNames(pathOf(hosted))),
+              ofHost(Texts{"HostedDHCPPoint Dependent[DHCPProtocolEndpoint @ eth0]",
+                           "HostedDHCPPoint Dependent[DHCPProtocolEndpoint @ eth1]",
+                           "HostedDHCPPoint Dependent[DHCPProtocolEndpoint @ eth2]",
+                           "HostedDHCPPoint Dependent[DHCPProtocolEndpoint BMC:-1 bmc0]"}));
+    host_.counted().fail(Function::enumerateInstances, 1, Fault::null);
+    const Host::Answer instances = host_.enumerate(pathOf(hosted));
+    ASSERT_THAT(instances.instances, SizeIs(4));
+    EXPECT_EQ(instances.instances[0]->property("Antecedent"), nullptr);
+    EXPECT_NE(instances.instances[0]->property("Dependent"), nullptr);
 }
 
 // Failures in one association.

@@ -51,6 +51,24 @@ cimom::ObjectPath pathFrom(const std::string& text) {
     return cimom::parseObjectPath("root/cimv2:" + ofHost(text));
 }
 
+std::string endPath(const std::string& className, const std::string& interface) {
+    if (className == "QVXZR_ComputerSystem") {
+        return className + R"(.CreationClassName="QVXZR_ComputerSystem",Name="@")";
+    }
+    if (className == "QVXZR_DHCPCapabilities") {
+        return className + ".InstanceID=\"" + interface + '"';
+    }
+    if (className == "QVXZR_DHCPSettingData") {
+        return className + ".InstanceID=\"Computer%" + interface + '"';
+    }
+    if (className == "QVXZR_IPAssignmentSettingData") {
+        return className + ".InstanceID=\"Computer%" + interface + "%dhcp\"";
+    }
+    const char* suffix = className == "QVXZR_DHCPRemoteServiceAccessPoint" ? "_IPv4" : "";
+    return className + R"(.SystemCreationClassName="QVXZR_ComputerSystem",SystemName="@",)" +
+           "CreationClassName=\"" + className + "\",Name=\"" + interface + suffix + '"';
+}
+
 std::string ofHost(const std::string& text) {
     std::string result = text;
     for (std::size_t at = result.find('@'); at != std::string::npos; at = result.find('@')) {

@@ -20,6 +20,11 @@ Texts briefs(const Host::Answer& answer);
 /// A path of the default namespace from its text, with this host's name for "@".
 cimom::ObjectPath pathFrom(const std::string& text);
 
+/// The text of a path of one of the classes at the ends of associations: the object
+/// of this interface, with "@" for the host's name. An access point is that of the
+/// interface's server at an IPv4 address.
+std::string endPath(const std::string& className, const std::string& interface);
+
 /// The texts with this host's name for "@".
 Texts ofHost(const Texts& texts);
 std::string ofHost(const std::string& text);

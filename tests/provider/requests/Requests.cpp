@@ -28,21 +28,10 @@ constexpr const char* nameOf(Operation operation) {
     return "";
 }
 
-constexpr const char* computerPath =
-    R"(QVXZR_ComputerSystem.CreationClassName="QVXZR_ComputerSystem",Name="@")";
-constexpr const char* endpointPath =
-    R"(QVXZR_DHCPProtocolEndpoint.SystemCreationClassName="QVXZR_ComputerSystem",)"
-    R"(SystemName="@",CreationClassName="QVXZR_DHCPProtocolEndpoint",Name="eth0")";
-constexpr const char* ipEndpointPath =
-    R"(QVXZR_IPProtocolEndpoint.SystemCreationClassName="QVXZR_ComputerSystem",)"
-    R"(SystemName="@",CreationClassName="QVXZR_IPProtocolEndpoint",Name="eth0")";
-constexpr const char* serverPath =
-    R"(QVXZR_DHCPRemoteServiceAccessPoint.SystemCreationClassName="QVXZR_ComputerSystem",)"
-    R"(SystemName="@",CreationClassName="QVXZR_DHCPRemoteServiceAccessPoint",Name="eth0_IPv4")";
-constexpr const char* capabilitiesPath = R"(QVXZR_DHCPCapabilities.InstanceID="eth0")";
-constexpr const char* settingPath = R"(QVXZR_DHCPSettingData.InstanceID="Computer%eth0")";
-constexpr const char* assignmentPath =
-    R"(QVXZR_IPAssignmentSettingData.InstanceID="Computer%eth0%dhcp")";
+/// The end of an association on the first interface.
+std::string end(const char* className) {
+    return endPath(className, "eth0");
+}
 
 }  // namespace
 
@@ -101,24 +90,33 @@ Host::Answer run(Host& host, const Request& request) {
 
 const std::vector<AssociationSources>& associationSources() {
     static const std::vector<AssociationSources> sources{
-        {"QVXZR_HostedDHCPPoint", computerPath, endpointPath},
-        {"QVXZR_SAPSAPDependency", ipEndpointPath, endpointPath},
-        {"QVXZR_DHCPElementCapabilities", endpointPath, capabilitiesPath},
-        {"QVXZR_DHCPRemoteHostedAccessPoint", computerPath, serverPath},
-        {"QVXZR_DHCPRemoteAccessAvailableToElement", serverPath, endpointPath},
-        {"QVXZR_DHCPElementSettingData", endpointPath, settingPath},
-        {"QVXZR_DHCPOrderedComponent", assignmentPath, settingPath},
+        {"QVXZR_HostedDHCPPoint", end("QVXZR_ComputerSystem"), end("QVXZR_DHCPProtocolEndpoint")},
+        {"QVXZR_SAPSAPDependency", end("QVXZR_IPProtocolEndpoint"),
+         end("QVXZR_DHCPProtocolEndpoint")},
+        {"QVXZR_DHCPElementCapabilities", end("QVXZR_DHCPProtocolEndpoint"),
+         end("QVXZR_DHCPCapabilities")},
+        {"QVXZR_DHCPRemoteHostedAccessPoint", end("QVXZR_ComputerSystem"),
+         end("QVXZR_DHCPRemoteServiceAccessPoint")},
+        {"QVXZR_DHCPRemoteAccessAvailableToElement", end("QVXZR_DHCPRemoteServiceAccessPoint"),
+         end("QVXZR_DHCPProtocolEndpoint")},
+        {"QVXZR_DHCPElementSettingData", end("QVXZR_DHCPProtocolEndpoint"),
+         end("QVXZR_DHCPSettingData")},
+        {"QVXZR_DHCPOrderedComponent", end("QVXZR_IPAssignmentSettingData"),
+         end("QVXZR_DHCPSettingData")},
     };
     return sources;
 }
 
 const std::vector<ElementSource>& elementSources() {
-    static const std::vector<ElementSource> sources{
-        {"QVXZR_DHCPProtocolEndpoint", endpointPath},
-        {"QVXZR_DHCPCapabilities", capabilitiesPath},
-        {"QVXZR_DHCPSettingData", settingPath},
-        {"QVXZR_DHCPRemoteServiceAccessPoint", serverPath},
-    };
+    static const std::vector<ElementSource> sources = [] {
+        std::vector<ElementSource> all;
+        for (const char* className :
+             {"QVXZR_DHCPProtocolEndpoint", "QVXZR_DHCPCapabilities", "QVXZR_DHCPSettingData",
+              "QVXZR_DHCPRemoteServiceAccessPoint"}) {
+            all.push_back({className, end(className)});
+        }
+        return all;
+    }();
     return sources;
 }
 
@@ -129,7 +127,7 @@ std::vector<Request> allRequests() {
         requests.push_back({Operation::enumerate, className});
         requests.push_back({Operation::get, path});
     }
-    requests.push_back({Operation::modify, settingPath});
+    requests.push_back({Operation::modify, end("QVXZR_DHCPSettingData")});
     for (const auto& [association, first, second] : associationSources()) {
         requests.push_back({Operation::enumerateNames, association});
         requests.push_back({Operation::enumerate, association});

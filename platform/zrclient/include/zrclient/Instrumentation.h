@@ -34,6 +34,11 @@ class Instrumentation {
     /// when it has no such node (any more). Does not look at the machine.
     bool selectNode(const std::string& path);
 
+    /// Stands on the parent of the other cursor's node, as selectNode of the path that
+    /// getPathToParentNode gives would, but makes no path of it as long as the latest
+    /// snapshot is that of the other cursor.
+    bool selectParentOf(const Instrumentation& other);
+
     /// True while the cursor stands on a node.
     explicit operator bool() const noexcept { return node_ != Snapshot::none; }
 

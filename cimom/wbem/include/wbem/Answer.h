@@ -1,0 +1,35 @@
+#pragma once
+
+#include <cstddef>
+#include <functional>
+#include <string>
+#include <utility>
+
+namespace cimom::wbem {
+
+/// The body of an answer, which is written piece by piece: the XML of a long
+/// result is never held as a whole. Used by one thread at a time.
+class Answer {
+  public:
+    /// Appends the next object; false, without appending, when there is none.
+    using Items = std::function<bool(std::string&)>;
+
+    /// A body that is at hand.
+    explicit Answer(std::string whole) : head_(std::move(whole)) {}
+    Answer(std::string head, Items items, std::string tail)
+        : head_(std::move(head)), items_(std::move(items)), tail_(std::move(tail)) {}
+
+    /// Appends to `out` until that has at least `size` bytes or the body ends.
+    void write(std::string& out, std::size_t size);
+    /// Whether the whole body has been written.
+    [[nodiscard]] bool ended() const noexcept { return ended_; }
+
+  private:
+    std::string head_;
+    Items items_;
+    std::string tail_;
+    bool begun_ = false;
+    bool ended_ = false;
+};
+
+}  // namespace cimom::wbem

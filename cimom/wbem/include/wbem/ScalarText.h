@@ -1,0 +1,27 @@
+#pragma once
+
+#include <optional>
+#include <string>
+#include <string_view>
+
+#include "cimom/Cim.h"
+
+namespace cimom::wbem {
+
+/// Appends a value as the text that VALUE and KEYVALUE hold (DSP0201, 5.2.4 and
+/// 5.2.6), escaped for XML: numbers in decimal, TRUE and FALSE, reals with a point
+/// and as many digits as bring the same number back, INF, -INF and NaN, one
+/// character, 25 characters of a datetime. Writes nothing for null, references and
+/// instances, which are no texts. `type` tells how many digits a real needs.
+void appendScalarText(std::string& out, Type type, const Scalar& scalar);
+
+/// Reads such a text as a value of the type; hexadecimal integers ("0x1F") are
+/// accepted, white space only in texts. Nothing when the text is no value of the
+/// type, or the type is one whose values are no texts.
+[[nodiscard]] std::optional<Scalar> readScalarText(Type type, std::string_view text);
+
+/// Reads the text of a number whose type is not known: an unsigned integer, else a
+/// signed one, else a real64.
+[[nodiscard]] std::optional<Value> readNumberText(std::string_view text);
+
+}  // namespace cimom::wbem

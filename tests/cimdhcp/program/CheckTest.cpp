@@ -1,0 +1,126 @@
+// "cimdhcp check" on machines that lack something.
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <nlohmann/json.hpp>
+
+#include "ProgramRun.h"
+
+namespace {
+
+namespace fs = std::filesystem;
+using test::Ended;
+using testing::HasSubstr;
+using testing::Not;
+
+class Check : public test::ProgramTest {
+  protected:
+    Ended check(std::vector<std::string> options = {}) const {
+        options.emplace_back("check");
+        return run(std::move(options));
+    }
+
+    std::string emptyDirectory() const {
+        const std::string path = directory() / "empty";
+        fs::create_directories(path);
+        return path;
+    }
+};
+
+TEST_F(Check, OnAGoodMachineEverythingIsInOrder) {
+    const Ended ended = check();
+    EXPECT_EQ(ended.status, 0);
+    EXPECT_EQ(ended.err, "");
+    EXPECT_THAT(ended.out,
+                HasSubstr("ok    settings: " + (directory() / "platform.conf") + " is read\n"));
+    EXPECT_THAT(ended.out, HasSubstr("ok    machine: tree " + tree() +
+                                     " has 2 interfaces, 1 of them with DHCP\n"));
+    EXPECT_THAT(ended.out, HasSubstr("ok    instance factory: of provider DHCPClientProvider\n"));
+    EXPECT_THAT(ended.out,
+                HasSubstr("ok    association factory: of provider DHCPClientProvider\n"));
+    EXPECT_THAT(ended.out, HasSubstr("ok    QVXZR_DHCPProtocolEndpoint: 1 instance\n"));
+    EXPECT_THAT(ended.out, HasSubstr("ok    QVXZR_DHCPSettingData: 2 instances\n"));
+    EXPECT_THAT(ended.out, Not(HasSubstr("BAD")));
+    EXPECT_THAT(ended.out, HasSubstr("Nothing is wrong"));
+}
+
+TEST_F(Check, TellsThatNoInterfaceUsesDhcp) {
+    setTree("");
+    const Ended ended = check();
+    EXPECT_EQ(ended.status, 0);
+    EXPECT_THAT(ended.out, HasSubstr("note  machine: tree " + tree() +
+                                     " has 0 interfaces, 0 of them with DHCP: the DHCP classes are "
+                                     "empty\n      -> "));
+    EXPECT_THAT(ended.out, HasSubstr("note  QVXZR_DHCPProtocolEndpoint: no instance\n"));
+}
+
+TEST_F(Check, TellsOfSettingsThatCannotBeUsed) {
+    ZR::Testing::writeFile(directory() / "platform.conf", "LOG_LEVEL=loud\n");
+    const Ended ended = check();
+    EXPECT_EQ(ended.status, 1);
+    EXPECT_THAT(ended.out, HasSubstr("BAD   settings: " + (directory() / "platform.conf")));
+    EXPECT_THAT(ended.out, HasSubstr("1 thing is wrong"));
+}
+
+TEST_F(Check, TellsOfATreeThatCannotBeRead) {
+    ZR::Testing::writeFile(tree(), "{");
+    const Ended ended = check();
+    EXPECT_EQ(ended.status, 1);
+    EXPECT_THAT(ended.out, HasSubstr("BAD   tree: " + tree()));
+    // The rest is looked at all the same.
+    EXPECT_THAT(ended.out, HasSubstr("ok    schema: "));
+}
+
+TEST_F(Check, TellsOfAMissingDataDirectory) {
+    fs::remove_all(dataDir());
+    const Ended ended = check();
+    EXPECT_EQ(ended.status, 0);
+    EXPECT_THAT(ended.out, HasSubstr("note  data directory: " + dataDir() + "/ does not exist"));
+    EXPECT_THAT(ended.out, HasSubstr("-> mkdir -p " + dataDir()));
+}
+
+TEST_F(Check, TellsOfAMissingLibrary) {
+    const Ended ended = check({"--provider-dir", emptyDirectory()});
+    EXPECT_EQ(ended.status, 1);
+    EXPECT_THAT(ended.out,
+                HasSubstr("BAD   library: libDHCPClientProvider.so is not in " + emptyDirectory()));
+    EXPECT_THAT(ended.out, HasSubstr("BAD   QVXZR_DHCPProtocolEndpoint: CIM_ERR_FAILED"));
+}
+
+TEST_F(Check, TellsOfALibraryWithoutFactories) {
+    fs::copy(NO_PROVIDER_LIBRARY, emptyDirectory() + "/libDHCPClientProvider.so");
+    const Ended ended = check({"--provider-dir", emptyDirectory()});
+    EXPECT_EQ(ended.status, 1);
+    EXPECT_THAT(ended.out, HasSubstr("BAD   instance factory: "));
+    EXPECT_THAT(ended.out, HasSubstr("BAD   association factory: "));
+    EXPECT_THAT(ended.out, HasSubstr("DHCPClientProvider_Create_AssociationMI"));
+}
+
+TEST_F(Check, TellsOfAFaultInSchemaOrRegistration) {
+    const std::string schema = emptyDirectory();
+    ZR::Testing::writeFile(schema + "/a.mof", "class {");
+    ZR::Testing::writeFile(schema + "/a.registration", "");
+    const Ended broken = check({"--schema-dir", schema});
+    EXPECT_EQ(broken.status, 1);
+    EXPECT_THAT(broken.out, HasSubstr("BAD   schema and registration: " + schema + "/a.mof:1:7"));
+    fs::remove(schema + "/a.registration");
+    EXPECT_THAT(check({"--schema-dir", schema}).out,
+                HasSubstr("BAD   installation: " + schema + ": no *.registration file is in it"));
+}
+
+TEST_F(Check, TellsOfANamespaceThatNobodyServes) {
+    const Ended ended = check({"--namespace", "root/other"});
+    EXPECT_EQ(ended.status, 1);
+    EXPECT_THAT(ended.out, HasSubstr("BAD   registration: no class is served in root/other"));
+}
+
+TEST_F(Check, HasAFormForPrograms) {
+    const Ended ended = check({"--format", "json"});
+    const auto findings = nlohmann::json::parse(ended.out).at("findings");
+    ASSERT_FALSE(findings.empty());
+    EXPECT_EQ(findings[0].at("verdict"), "good");
+    EXPECT_EQ(findings[0].at("what"), "settings");
+    EXPECT_EQ(findings[0].at("remedy"), "");
+}
+
+}  // namespace

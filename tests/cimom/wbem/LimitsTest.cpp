@@ -1,0 +1,100 @@
+#include "wbem/Limits.h"
+
+#include <gtest/gtest.h>
+
+#include <stdexcept>
+
+#include "wbem/Server.h"
+
+namespace cimom::wbem {
+
+template <typename Change>
+std::string complaint(Change&& change) {
+    Limits limits;
+    change(limits);
+    try {
+        limits.check();
+    } catch (const std::invalid_argument& error) {
+        return error.what();
+    }
+    return "none";
+}
+
+TEST(Limits, AreGoodByDefault) {
+    EXPECT_EQ(complaint([](Limits&) {}), "none");
+}
+
+TEST(Limits, CannotBeSwitchedOffByZero) {
+    const auto number = [](std::size_t Limits::*limit) {
+        return complaint([limit](Limits& limits) { limits.*limit = 0; });
+    };
+    EXPECT_EQ(number(&Limits::headerLine), "max-header-line is 0; it may be 64 to 65536");
+    EXPECT_EQ(number(&Limits::headers), "max-headers is 0; it may be 256 to 262144");
+    EXPECT_EQ(number(&Limits::body), "max-body is 0; it may be 1 to 1073741824");
+    EXPECT_EQ(number(&Limits::depth), "max-depth is 0; it may be 8 to 256");
+    EXPECT_EQ(number(&Limits::connections), "max-connections is 0; it may be 1 to 65536");
+    EXPECT_EQ(number(&Limits::workers), "workers is 0; it may be 1 to 256");
+    EXPECT_EQ(number(&Limits::ioThreads), "io-threads is 0; it may be 1 to 64");
+    EXPECT_EQ(number(&Limits::waiting), "max-waiting is 0; it may be 1 to 65536");
+    const auto seconds = [](std::chrono::seconds Limits::*limit, int value) {
+        return complaint([=](Limits& limits) { limits.*limit = std::chrono::seconds(value); });
+    };
+    EXPECT_EQ(seconds(&Limits::request, 0), "request-timeout is 0; it may be 1 to 86400");
+    EXPECT_EQ(seconds(&Limits::answer, 0), "answer-timeout is 0; it may be 1 to 86400");
+    EXPECT_NE(seconds(&Limits::answer, -1), "none");
+    EXPECT_EQ(complaint([](Limits& limits) { limits.sessions.sessions = 0; }),
+              "max-enumerations is 0; it may be 1 to 65536");
+    EXPECT_EQ(
+        complaint([](Limits& limits) { limits.sessions.defaultTimeout = std::chrono::seconds(0); }),
+        "enumeration-timeout is 0; it may be 1 to 86400");
+    EXPECT_EQ(
+        complaint([](Limits& limits) { limits.sessions.longestTimeout = std::chrono::seconds(0); }),
+        "max-enumeration-timeout is 0; it may be 1 to 86400");
+}
+
+TEST(Limits, HaveAnUpperEnd) {
+    EXPECT_EQ(complaint([](Limits& limits) { limits.depth = 256; }), "none");
+    EXPECT_EQ(complaint([](Limits& limits) { limits.depth = 257; }),
+              "max-depth is 257; it may be 8 to 256");
+    EXPECT_EQ(complaint([](Limits& limits) { limits.connections = 1; }),
+              "max-connections is below io-threads");
+}
+
+std::string settingsComplaint(const ServerSettings& settings) {
+    try {
+        checkSettings(settings);
+    } catch (const ServerError& error) {
+        return error.what();
+    }
+    return "none";
+}
+
+TEST(ServerSettings, OnlyThisMachineIsServedWithoutTlsAndUsers) {
+    ServerSettings settings;
+    EXPECT_EQ(settingsComplaint(settings), "none");
+    settings.address = "127.3.2.1";
+    EXPECT_EQ(settingsComplaint(settings), "none");
+    settings.address = "::1";
+    EXPECT_EQ(settingsComplaint(settings), "none");
+    for (const char* address : {"0.0.0.0", "::", "192.0.2.1", "2001:db8::1", "::ffff:127.0.0.1"}) {
+        settings.address = address;
+        EXPECT_EQ(settingsComplaint(settings),
+                  std::string(address) +
+                      " can be reached from other machines: this needs TLS (--tls-cert and "
+                      "--tls-key), or passwords could be read on the way");
+    }
+    settings.tls.emplace();
+    EXPECT_EQ(settingsComplaint(settings),
+              "::ffff:127.0.0.1 can be reached from other machines: this needs users (--users, "
+              "made by \"cimdhcp user add\"), or anybody could use it");
+    settings.users.emplace();
+    EXPECT_EQ(settingsComplaint(settings), "none");
+}
+
+TEST(ServerSettings, NeedANumericAddress) {
+    ServerSettings settings;
+    settings.address = "localhost";
+    EXPECT_EQ(settingsComplaint(settings), "\"localhost\" is no IPv4 or IPv6 address");
+}
+
+}  // namespace cimom::wbem

@@ -1,0 +1,62 @@
+#include "TaskPool.h"
+
+#include <gtest/gtest.h>
+
+#include <future>
+
+namespace cimom::wbem {
+
+TEST(TaskPool, RunsTasksOnItsThreads) {
+    TaskPool pool(2, 10);
+    std::promise<void> both;
+    std::atomic<int> arrived{0};
+    std::promise<void> go;
+    const std::shared_future<void> gone = go.get_future().share();
+    for (int count = 0; count < 2; ++count) {
+        pool.run([&, gone] {
+            if (++arrived == 2) {
+                both.set_value();
+            }
+            gone.wait();
+        });
+    }
+    both.get_future().wait();  // would hang if one thread did both
+    go.set_value();
+}
+
+TEST(TaskPool, LetsOnlySoManyWait) {
+    TaskPool pool(1, 2);
+    std::promise<void> running;
+    std::promise<void> go;
+    EXPECT_TRUE(pool.run([&] {
+        running.set_value();
+        go.get_future().wait();
+    }));
+    running.get_future().wait();
+    EXPECT_TRUE(pool.run([] {}));
+    EXPECT_TRUE(pool.run([] {}));
+    EXPECT_FALSE(pool.run([] {}));
+    go.set_value();
+}
+
+TEST(TaskPool, RunsTasksNoEarlierThanTheyShould) {
+    TaskPool pool(1, 2);
+    const auto start = TaskPool::Clock::now();
+    std::promise<TaskPool::Clock::time_point> run;
+    pool.runAfter(std::chrono::hours(1), [] { FAIL() << "an hour early"; });
+    pool.runAfter(std::chrono::milliseconds(20), [&] { run.set_value(TaskPool::Clock::now()); });
+    EXPECT_GE(run.get_future().get() - start, std::chrono::milliseconds(20));
+}
+
+TEST(TaskPool, ForgetsWhatWaitsWhenItStops) {
+    auto held = std::make_shared<int>(1);
+    const std::weak_ptr<int> watched = held;
+    TaskPool pool(1, 2);
+    pool.runAfter(std::chrono::hours(1), [held = std::move(held)] { FAIL() << *held; });
+    pool.stop();
+    EXPECT_TRUE(watched.expired());
+    EXPECT_FALSE(pool.run([] { FAIL(); }));
+    EXPECT_FALSE(pool.runAfter(std::chrono::seconds(0), [] { FAIL(); }));
+}
+
+}  // namespace cimom::wbem
