@@ -49,6 +49,7 @@ _cimdhcp() {
         case $command in
             rename) options+=' --create' ;;
             graph) options+=' --svg' ;;
+            tree) options+=' --explain' ;;
             associators) options+=' --names --assoc-class --result-class --role --result-role' ;;
             references) options+=' --names --result-class --role' ;;
         esac

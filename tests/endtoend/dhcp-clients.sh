@@ -198,18 +198,19 @@ current=eth1
 agrees() {
     local address operstate state=0 expected='[]'
     address=$(kernel_address "$current")
+    look || return 1
     operstate=$(ip -n "$client" -j link show dev "$current" | jq -r '.[0].operstate')
     [[ $operstate == UP ]] && state=1
-    [[ $(value InterfaceState "$current") == "$state" ]] || return 1
+    [[ $(seen InterfaceState "$current") == "$state" ]] || return 1
     if [[ -z $address ]]; then
-        [[ -z $(value IPv4Address "$current") ]] || return 1
+        [[ -z $(seen IPv4Address "$current") ]] || return 1
     else
-        [[ $(value IPv4Address "$current") == "\"$address\"" ]] || return 1
-        [[ $(value AddressSource "$current") == 1 ]] || return 1
-        [[ $(value DHCPEnabled "$current") == true ]] || return 1
+        [[ $(seen IPv4Address "$current") == "\"$address\"" ]] || return 1
+        [[ $(seen AddressSource "$current") == 1 ]] || return 1
+        [[ $(seen DHCPEnabled "$current") == true ]] || return 1
         [[ $(said_address) == "$address" ]] && expected="[\"$(said_server)\"]"
     fi
-    [[ $(value DHCPServerAddresses "$current") == "$expected" ]]
+    [[ $(seen DHCPServerAddresses "$current") == "$expected" ]]
 }
 explain() {
     echo "--- the program:"; cimdhcp tree
@@ -218,7 +219,7 @@ explain() {
 }
 step() {
     eventually agrees || { explain; fail "$kind, $1: the program shows something else"; }
-    echo "$kind, $1: $(value IPv4Address "$current") from $(value DHCPServerAddresses "$current")"
+    echo "$kind, $1: $(seen IPv4Address "$current") from $(seen DHCPServerAddresses "$current")"
 }
 leased() {
     [[ -n $(kernel_address "$current") && $(said_address) == "$(kernel_address "$current")" ]]
@@ -231,6 +232,19 @@ start_client || { tail -20 "$work/client.log"; fail "$kind does not start"; }
 eventually leased || { explain; fail "$kind gets no lease"; }
 step "with a lease"
 expect 198.51.100.1 cimdhcp show
+
+# Whoever may not read a source is told so in one line, and sees what is left.
+as_nobody() {
+    in_client setpriv --reuid 65534 --regid 65534 --clear-groups env ZR_LOG_SINK=none \
+        ZR_DATA_DIR="$work/data" "$program" "$@"
+}
+if [[ $kind == dhcpcd ]] && as_nobody --version >/dev/null 2>&1; then
+    as_nobody show >"$work/shown" 2>"$work/told" || fail "show as nobody answers status $?"
+    [[ $(wc -l <"$work/told") == 1 ]] || fail "not one line: $(<"$work/told")"
+    grep -q "cannot read /var/lib/dhcpcd/eth1.lease: Permission denied" "$work/told" ||
+        fail "not told: $(<"$work/told")"
+    grep -Eq "^eth1 +on .*$(kernel_address)" "$work/shown" || fail "not shown: $(<"$work/shown")"
+fi
 
 ip -n "$client" link set cable down
 step "with the cable out"

@@ -8,7 +8,7 @@
 #   in_client ...   runs a command on the client's machine, in_server ... on the server's
 #   cimdhcp ...     runs the program on the client's machine
 #   start_server    starts the server, with further options of dnsmasq
-#   fail, expect, eventually, value, kernel_address    see below
+#   fail, expect, eventually, look, seen, value, kernel_address    see below
 # The server is 198.51.100.1 and gives addresses from 198.51.100.100 on; the client's
 # link is eth1.
 
@@ -21,19 +21,12 @@ done
 server=zr-server-$$
 client=zr-client-$$
 work=$(mktemp -d)
-dnsmasq_pid=
 holder=
-at_end=()  # commands to run before the laboratory goes
 
 cleanup() {
-    local command
-    for command in "${at_end[@]}"; do
-        eval "$command" 2>/dev/null || true
-    done
-    [[ -n $dnsmasq_pid ]] && kill "$dnsmasq_pid" 2>/dev/null || true
-    # Whatever the client's machine still runs, by its number: it is all the test's own.
+    # Whatever the two machines still run, by its number: it is all the test's own.
     local pid
-    for pid in $(ip netns pids "$client" 2>/dev/null); do
+    for pid in $(ip netns pids "$client" 2>/dev/null) $(ip netns pids "$server" 2>/dev/null); do
         kill -9 "$pid" 2>/dev/null || true
     done
     ip netns delete "$client" 2>/dev/null || true
@@ -41,6 +34,7 @@ cleanup() {
     rm -rf "$work"
 }
 trap cleanup EXIT
+trap 'exit 1' INT TERM HUP
 
 fail() {
     echo "FAILED: $*"
@@ -104,16 +98,23 @@ start_server() {
         --dhcp-range=198.51.100.100,198.51.100.150,255.255.255.0,10m \
         --dhcp-leasefile="$work/server.leases" --pid-file="$work/dnsmasq.pid" \
         "$@" >"$work/dnsmasq.log" 2>&1 &
-    dnsmasq_pid=$!
+    disown  # its end is no news
 }
 
-# value PROPERTY [INTERFACE]: what the program sees, as compact JSON; nothing when the
-# interface or the property is not there.
-value() {
-    cimdhcp tree | jq -c --arg name "${2:-eth1}" --arg property "$1" \
+# look: reads the machine once. seen PROPERTY [INTERFACE]: what was seen then, as compact
+# JSON; nothing when the interface or the property is not there.
+look() {
+    cimdhcp tree >"$work/tree.json"
+}
+seen() {
+    jq -c --arg name "${2:-eth1}" --arg property "$1" \
         '[.. | objects | select(.type? == "NetworkInterface" and .properties.Name == $name)
           | .properties | select(has($property)) | .[$property]]
-         | if length == 0 then empty else .[0] end'
+         | if length == 0 then empty else .[0] end' "$work/tree.json"
+}
+# value PROPERTY [INTERFACE]: both at once.
+value() {
+    look && seen "$@"
 }
 
 # kernel_address [INTERFACE]: the IPv4 address that the kernel has, without its length.

@@ -69,7 +69,7 @@ TEST_F(IfcfgTest, EachProtocolHasItsMeaning) {
     for (const char* dhcp : {"dhcp", "DHCP", "dhcp4", "dhcp+autoip"}) {
         EXPECT_EQ(withProtocol(dhcp), configuration(true)) << dhcp;
     }
-    for (const char* none : {"", "none", "static", "auto6", "6to4"}) {
+    for (const char* none : {"none", "static", "auto6", "6to4"}) {
         EXPECT_EQ(withProtocol(none), configuration(false)) << none;
     }
     LinkConfiguration bootp = configuration(false);
@@ -85,6 +85,16 @@ TEST_F(IfcfgTest, EachProtocolHasItsMeaning) {
     dhcp6.dhcp6 = true;
     EXPECT_EQ(withProtocol("dhcp6"), dhcp6);
     EXPECT_EQ(withProtocol("ibft"), configuration(std::nullopt));
+}
+
+TEST_F(IfcfgTest, WithoutAProtocolOnlyAnAddressTells) {
+    EXPECT_EQ(withProtocol(""), configuration(std::nullopt));
+    root_.write(file, "DEVICE=eth1\nCONFIG_NAME=office\n");
+    EXPECT_THAT(read(), ElementsAre(configuration(std::nullopt)));
+    root_.write(file, "DEVICE=eth1\nIPADDR=192.0.2.1\n");
+    LinkConfiguration fixed = configuration(false);
+    fixed.staticAddresses = {"192.0.2.1"};
+    EXPECT_THAT(read(), ElementsAre(fixed));
 }
 
 TEST_F(IfcfgTest, WithoutADeviceTheNameOfTheFileIsIt) {

@@ -54,6 +54,11 @@ class LiveMachineTest : public testing::Test {
         surroundings.roots = {.files = root_.path(), .proc = root_.path("/proc")};
         surroundings.transport = std::make_unique<ScriptedTransport>(std::move(answers));
         surroundings.realProcesses = false;
+        surroundings.uptime = [this] { return uptime_; };
+        surroundings.askNetworkd = [this](auto /*deadline*/) {
+            ++asked_;
+            return networkd_;
+        };
         surroundings.now = [this] { return now_; };
         surroundings.complain = [this](std::string_view text) { complaints_.emplace_back(text); };
         machine_ = std::make_unique<LiveMachine>(std::move(surroundings));
@@ -62,6 +67,9 @@ class LiveMachineTest : public testing::Test {
 
     TemporaryDirectory root_;
     std::int64_t now_ = 1'795'216'200;
+    std::chrono::steady_clock::time_point uptime_{std::chrono::hours{1000}};
+    NetworkdAnswer networkd_;
+    int asked_ = 0;
     std::vector<std::string> complaints_;
     std::unique_ptr<LiveMachine> machine_;
 };
@@ -77,6 +85,51 @@ TEST_F(LiveMachineTest, CapturedNetworkdLeaseOnItsLink) {
               PropertyValue{Servers{"198.51.100.1"}});
     EXPECT_EQ(valueOf(*tree, "eth1", Properties::IPv4Address), PropertyValue{"198.51.100.110"});
     EXPECT_THAT(complaints_, IsEmpty());
+}
+
+TEST_F(LiveMachineTest, NetworkdItselfTellsOfTheServerOfADhcpv6Lease) {
+    root_.write("/run/systemd/netif/links/2", sample("networkd/run-systemd-netif-links-2.txt"));
+    networkd_.json = sample("networkd/networkctl-status-eth1.json");
+    ifaddrmsg info{};
+    info.ifa_family = 10;
+    info.ifa_prefixlen = 128;
+    info.ifa_index = 2;
+    Message longer{RTM_NEWADDR, NLM_F_MULTI, info};
+    constexpr std::array<std::uint8_t, 16> bytes{0x20, 0x01, 0x0d, 0xb8, 0, 0x99, 0, 0,
+                                                 0,    0,    0,    0,    0, 0,    1, 0xb2};
+    longer.attribute(IFA_ADDRESS, std::as_bytes(std::span{bytes}));
+    const std::vector<Step> both{Step{{addressMessage(2, {198, 51, 100, 110}), longer,
+                                       Message{NLMSG_DONE, NLM_F_MULTI, std::int32_t{0}}}}};
+    EXPECT_EQ(valueOf(*open({links(1), both}).read(), "eth1", Properties::DHCPServerAddresses),
+              (PropertyValue{Servers{"198.51.100.1", "fe80::e0cb:10ff:feee:2799"}}));
+}
+
+TEST_F(LiveMachineTest, NetworkdIsAskedOnlyWhereItHasLinks) {
+    static_cast<void>(open({links(1), address(2, {192, 0, 2, 1})}).read());
+    EXPECT_EQ(asked_, 0);
+}
+
+TEST_F(LiveMachineTest, ANetworkdThatDoesNotAnswerIsLeftAloneForAWhile) {
+    root_.write("/run/systemd/netif/links/2", sample("networkd/run-systemd-netif-links-2.txt"));
+    root_.write("/run/systemd/netif/leases/2", sample("networkd/run-systemd-netif-leases-2.txt"));
+    networkd_.reason = "too busy";
+    std::deque<std::vector<Step>> answers;
+    for (int i = 0; i < 4; ++i) {
+        answers.push_back(links(1));
+        answers.push_back(address(2, {198, 51, 100, 110}));
+    }
+    LiveMachine& machine = open(std::move(answers));
+    EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{"198.51.100.1"}})
+        << "its files tell it, too";
+    EXPECT_THAT(complaints_, ElementsAre("too busy"));
+    static_cast<void>(machine.read());
+    EXPECT_EQ(asked_, 1);
+    uptime_ += std::chrono::seconds{31};
+    networkd_ = {.json = "{", .reason = ""};
+    static_cast<void>(machine.read());
+    EXPECT_EQ(asked_, 2);
+    EXPECT_EQ(complaints_.back(), "cannot use what systemd-networkd says: no JSON object");
 }
 
 TEST_F(LiveMachineTest, CapturedDhclientLeaseLivesUntilItsEnd) {

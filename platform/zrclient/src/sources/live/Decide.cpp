@@ -180,10 +180,12 @@ constexpr std::array rows{
         [](const InterfaceView& view) { return view.enslaved ? Answer{kernel(false)} : Answer{}; }},
     DecisionRow{Properties::DHCPEnabled, "the link's manager holds a lease",
                 [](const InterfaceView& view) -> Answer {
-                    for (const Lease* lease : view.leases) {
-                        if (view.management != nullptr &&
-                            lease->client == view.management->client) {
-                            return from(*lease, true);
+                    for (const auto* leases : {&view.leases, &view.leases6}) {
+                        for (const Lease* lease : *leases) {
+                            if (view.management != nullptr &&
+                                lease->client == view.management->client) {
+                                return from(*lease, true);
+                            }
                         }
                     }
                     return std::nullopt;

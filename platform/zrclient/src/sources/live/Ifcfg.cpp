@@ -43,9 +43,15 @@ LinkConfiguration configurationOf(IfcfgFile&& file) {
     const std::string& protocol = file.bootProtocol;
     if (protocol == "dhcp" || protocol == "dhcp4" || protocol == "dhcp+autoip") {
         configuration.dhcp4 = true;
-    } else if (protocol.empty() || protocol == "none" || protocol.starts_with("static") ||
-               protocol == "bootp" || protocol == "autoip" || protocol == "shared" ||
-               protocol == "dhcp6" || protocol == "auto6" || protocol == "6to4") {
+    } else if (protocol.empty()) {
+        // A file with an address is of a static one. One without may be there for other
+        // settings, such as the configuration's name, and leave the rest to others.
+        if (!configuration.staticAddresses.empty()) {
+            configuration.dhcp4 = false;
+        }
+    } else if (protocol == "none" || protocol.starts_with("static") || protocol == "bootp" ||
+               protocol == "autoip" || protocol == "shared" || protocol == "dhcp6" ||
+               protocol == "auto6" || protocol == "6to4") {
         configuration.dhcp4 = false;
         configuration.bootp4 = protocol == "bootp";
         configuration.linkLocal4 = protocol == "autoip";

@@ -7,6 +7,7 @@
 #include <iterator>
 #include <unordered_set>
 #include <utility>
+#include <variant>
 
 #include "Clients.h"
 #include "Decide.h"
@@ -22,6 +23,11 @@ constexpr int errorLevel = 6000;
 
 // Leaves time for the files, out of the 250 ms that a reading may take.
 constexpr std::chrono::milliseconds kernelTime{150};
+constexpr std::chrono::milliseconds networkdTime{60};
+
+// A networkd that did not answer is left alone for so long: it would cost every reading
+// its time.
+constexpr std::chrono::seconds networkdPause{30};
 
 // Clients' own words name further places to look at, which in turn are to be
 // watched before they are read.
@@ -87,6 +93,7 @@ bool LiveMachine::changed() {
 
 std::shared_ptr<const Snapshot> LiveMachine::read() {
     ClientFacts clients = readClients();
+    consultNetworkd(clients);
     NetworkState network = reader_.read(std::chrono::steady_clock::now() + kernelTime);
     std::move(network.complaints.begin(), network.complaints.end(),
               std::back_inserter(clients.complaints));
@@ -106,6 +113,34 @@ std::shared_ptr<const Snapshot> LiveMachine::read() {
                    .clients = std::move(clients),
                    .serviceProcessor = std::move(processor)},
                   surroundings_.now(), surroundings_.explain);
+}
+
+/// Where networkd has links, asks it for what its files do not tell.
+void LiveMachine::consultNetworkd(ClientFacts& clients) {
+    const bool manages =
+        std::any_of(clients.managements.begin(), clients.managements.end(),
+                    [](const LinkConfiguration& each) { return each.client == Client::Networkd; });
+    const auto now = surroundings_.uptime();
+    if (!manages || !surroundings_.askNetworkd || now < networkdRest_) {
+        return;
+    }
+    const NetworkdAnswer answer =
+        surroundings_.askNetworkd(std::chrono::steady_clock::now() + networkdTime);
+    if (!answer.reason.empty()) {
+        clients.complaints.push_back(answer.reason);
+        networkdRest_ = now + networkdPause;
+        return;
+    }
+    if (answer.json.empty()) {
+        return;
+    }
+    const auto parsed = parseNetworkdDescription(answer.json);
+    if (const auto* const reason = std::get_if<std::string_view>(&parsed)) {
+        clients.complaints.push_back("cannot use what systemd-networkd says: " +
+                                     std::string{*reason});
+        return;
+    }
+    addNetworkdDescription(std::get<std::vector<NetworkdAddress>>(parsed), clients);
 }
 
 /// A program that ends may leave everything else as it was.

@@ -12,6 +12,7 @@
 #include "ChangeMonitor.h"
 #include "IpmiReader.h"
 #include "NetlinkTransport.h"
+#include "NetworkdBus.h"
 #include "Roots.h"
 #include "RtnetlinkReader.h"
 #include "zrclient/LiveSource.h"
@@ -34,6 +35,9 @@ struct Surroundings {
     /// The way to the service processor; null: the device of the machine at `roots`.
     std::unique_ptr<IpmiTransport> ipmi = nullptr;
     IpmiReader::Clock uptime = std::chrono::steady_clock::now;
+    /// Asks networkd for its description of itself; none: nobody is asked.
+    std::function<NetworkdAnswer(std::chrono::steady_clock::time_point)> askNetworkd =
+        Live::askNetworkd;
     Explain explain = Explain::No;
     /// Takes what could not be read, or not for certain.
     std::function<void(std::string_view)> complain;
@@ -49,6 +53,7 @@ class LiveMachine final : public SnapshotSource {
 
   private:
     [[nodiscard]] ClientFacts readClients();
+    void consultNetworkd(ClientFacts& clients);
     void watchProcesses(const ClientFacts& clients);
     void report(const std::vector<std::string>& complaints);
 
@@ -57,6 +62,7 @@ class LiveMachine final : public SnapshotSource {
     ChangeMonitor monitor_;
     IpmiReader processor_;
     std::vector<WatchedPlace> places_;
+    std::chrono::steady_clock::time_point networkdRest_;  // not to be asked before
     std::unordered_set<std::string> reported_;
 };
 
