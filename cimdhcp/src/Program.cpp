@@ -95,8 +95,7 @@ class Execution {
     [[nodiscard]] bool json() const { return options_.format == Format::json; }
 
     [[nodiscard]] Client openClient() const {
-        return Client(findDirectories(options_, installations(executableFile())),
-                      options_.nameSpace);
+        return {findDirectories(options_, installations(executableFile())), options_.nameSpace};
     }
 
     [[nodiscard]] std::string formatted(const Answer& answer, const Client& client) const {
