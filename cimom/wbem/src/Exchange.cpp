@@ -1,7 +1,6 @@
 #include "Exchange.h"
 
 #include <algorithm>
-#include <cstring>
 #include <exception>
 #include <utility>
 
@@ -35,7 +34,7 @@ ssize_t nextPiece(void* self, std::uint64_t /*position*/, char* buffer, std::siz
         return MHD_CONTENT_READER_END_WITH_ERROR;
     }
     const std::size_t length = std::min(space, sending.piece.size() - sending.offset);
-    std::memcpy(buffer, sending.piece.data() + sending.offset, length);
+    sending.piece.copy(buffer, length, sending.offset);
     sending.offset += length;
     return static_cast<ssize_t>(length);
 }
@@ -124,7 +123,7 @@ MHD_Result sendAnswer(MHD_Connection* connection, HttpAnswer answer, bool manPos
             MHD_add_response_header(response.get(), name, value.c_str()) == MHD_YES && complete;
     };
     if (isCim) {
-        add("Content-Type", "application/xml; charset=\"utf-8\"");
+        add("Content-Type", R"(application/xml; charset="utf-8")");
         // Of an M-POST's answer the mandatory header is prefixed (DSP0200, 7.2.2).
         if (manPost) {
             add("Ext", " ");
@@ -138,7 +137,7 @@ MHD_Result sendAnswer(MHD_Connection* connection, HttpAnswer answer, bool manPos
         add("CIMError", answer.cimError);
     }
     if (answer.authenticate) {
-        add("WWW-Authenticate", "Basic realm=\"CIM\", charset=\"UTF-8\"");
+        add("WWW-Authenticate", R"(Basic realm="CIM", charset="UTF-8")");
     }
     constexpr unsigned methodNotAllowed = 405;
     if (answer.status == methodNotAllowed) {

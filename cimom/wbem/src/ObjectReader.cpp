@@ -17,8 +17,8 @@ namespace {
 constexpr unsigned deepestEmbedding = 4;
 constexpr std::size_t embeddedDepth = 64;
 
-[[noreturn]] void misplaced(const XmlElement& element, const XmlElement& parent) {
-    throw NotValid("element " + element.name + " in " + parent.name);
+[[noreturn]] void misplaced(const XmlElement& inner, const XmlElement& outer) {
+    throw NotValid("element " + inner.name + " in " + outer.name);
 }
 
 /// Throws the CIM error for a value that its type does not have.

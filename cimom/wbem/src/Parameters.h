@@ -43,7 +43,7 @@ class Parameters {
 
   private:
     struct Entry {
-        const Parameter* parameter;
+        const Parameter* parameter = nullptr;
         bool used = false;
     };
 

@@ -1,13 +1,9 @@
 #include "wbem/Server.h"
 
-#include <arpa/inet.h>
 #include <microhttpd.h>
-#include <netdb.h>
-#include <sys/socket.h>
 #include <unistd.h>
 
 #include <array>
-#include <cerrno>
 #include <cstdarg>
 #include <cstdio>
 #include <cstring>
@@ -16,6 +12,7 @@
 
 #include "Connections.h"
 #include "Exchange.h"
+#include "ListeningSocket.h"
 #include "ModificationText.h"
 #include "TaskPool.h"
 #include "wbem/Authenticator.h"
@@ -36,75 +33,6 @@ constexpr std::uint16_t httpsPort = 5989;
 constexpr std::chrono::milliseconds watchInterval{100};
 /// How long clients have to take their last answers when the server ends.
 constexpr std::chrono::seconds farewell{2};
-constexpr const char* tlsPriorities = "NORMAL:-VERS-ALL:+VERS-TLS1.3:+VERS-TLS1.2";
-
-/// A listening socket, until libmicrohttpd has taken it.
-class ListeningSocket {
-  public:
-    ListeningSocket(const std::string& address, std::uint16_t port) {
-        addrinfo hints{};
-        hints.ai_flags = AI_NUMERICHOST | AI_NUMERICSERV | AI_PASSIVE;
-        hints.ai_socktype = SOCK_STREAM;
-        addrinfo* found = nullptr;
-        if (::getaddrinfo(address.c_str(), std::to_string(port).c_str(), &hints, &found) != 0) {
-            throw ServerError("\"" + address + "\" is no IPv4 or IPv6 address");
-        }
-        const std::unique_ptr<addrinfo, void (*)(addrinfo*)> owned(found, ::freeaddrinfo);
-        const std::string where = address + " port " + std::to_string(port) + ": ";
-        fd_ = ::socket(found->ai_family, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0);
-        const int yes = 1;
-        // Without it a restarted server would wait for old connections to be forgotten.
-        if (fd_ < 0 || ::setsockopt(fd_, SOL_SOCKET, SO_REUSEADDR, &yes, sizeof yes) != 0 ||
-            (found->ai_family == AF_INET6 &&
-             ::setsockopt(fd_, IPPROTO_IPV6, IPV6_V6ONLY, &yes, sizeof yes) != 0) ||
-            ::bind(fd_, found->ai_addr, found->ai_addrlen) != 0 || ::listen(fd_, SOMAXCONN) != 0) {
-            const int reason = errno;
-            close();
-            throw ServerError(where + std::strerror(reason));
-        }
-    }
-    ~ListeningSocket() { close(); }
-    ListeningSocket(const ListeningSocket&) = delete;
-    ListeningSocket& operator=(const ListeningSocket&) = delete;
-
-    [[nodiscard]] int get() const noexcept { return fd_; }
-    void release() noexcept { fd_ = -1; }
-
-    [[nodiscard]] std::uint16_t port() const {
-        sockaddr_storage storage{};
-        socklen_t length = sizeof storage;
-        auto* const address = reinterpret_cast<sockaddr*>(&storage);
-        if (::getsockname(fd_, address, &length) != 0) {
-            throw ServerError(std::strerror(errno));
-        }
-        return ntohs(storage.ss_family == AF_INET
-                         ? reinterpret_cast<const sockaddr_in*>(&storage)->sin_port
-                         : reinterpret_cast<const sockaddr_in6*>(&storage)->sin6_port);
-    }
-
-  private:
-    void close() noexcept {
-        if (fd_ >= 0) {
-            ::close(fd_);
-            fd_ = -1;
-        }
-    }
-
-    int fd_ = -1;
-};
-
-std::string addressText(const sockaddr* address) {
-    std::array<char, INET6_ADDRSTRLEN> text{};
-    const void* number = nullptr;
-    if (address != nullptr && address->sa_family == AF_INET) {
-        number = &reinterpret_cast<const sockaddr_in*>(address)->sin_addr;
-    } else if (address != nullptr && address->sa_family == AF_INET6) {
-        number = &reinterpret_cast<const sockaddr_in6*>(address)->sin6_addr;
-    }
-    const bool known = number != nullptr &&
-                       ::inet_ntop(address->sa_family, number, text.data(), text.size()) != nullptr;
-    return known ? text.data() : "unknown";
-}
 
 MHD_Result addHeader(void* headers, MHD_ValueKind /*kind*/, const char* name, const char* value) {
     static_cast<HttpHead*>(headers)->headers.emplace_back(name == nullptr ? "" : name,
@@ -213,13 +141,12 @@ class Server::Implementation {
             MHD_USE_EPOLL_INTERNAL_THREAD | MHD_ALLOW_SUSPEND_RESUME | MHD_USE_ERROR_LOG;
         if (settings_.tls) {
             flags |= MHD_USE_TLS;
-            const auto text = [&options](MHD_OPTION option, const char* value) {
-                // The library only reads what it gets so.
-                options.push_back({option, 0, const_cast<char*>(value)});
+            const auto text = [&options](MHD_OPTION option, std::string& value) {
+                options.push_back({option, 0, value.data()});
             };
-            text(MHD_OPTION_HTTPS_MEM_CERT, settings_.tls->certificate.c_str());
-            text(MHD_OPTION_HTTPS_MEM_KEY, settings_.tls->key.c_str());
-            text(MHD_OPTION_HTTPS_PRIORITIES, tlsPriorities);
+            text(MHD_OPTION_HTTPS_MEM_CERT, settings_.tls->certificate);
+            text(MHD_OPTION_HTTPS_MEM_KEY, settings_.tls->key);
+            text(MHD_OPTION_HTTPS_PRIORITIES, tlsPriorities_);
         }
         options.push_back({MHD_OPTION_END, 0, nullptr});
         daemon_.reset(MHD_start_daemon(flags, 0, nullptr, nullptr, &handleRequest, this,
@@ -231,8 +158,7 @@ class Server::Implementation {
                                         libraryComplaint_
                                   : "the server cannot start: " + libraryComplaint_);
         }
-        socket_ = socket.get();
-        socket.release();
+        socket_ = socket.release();
         starting_ = false;
     }
 
@@ -251,7 +177,9 @@ class Server::Implementation {
                                                                      va_list arguments) {
         auto& server = *static_cast<Implementation*>(self);
         std::array<char, 256> text{};
-        std::vsnprintf(text.data(), text.size(), format, arguments);
+        if (std::vsnprintf(text.data(), text.size(), format, arguments) < 0) {
+            return;
+        }
         std::string message = text.data();
         while (message.ends_with('\n')) {
             message.pop_back();
@@ -462,7 +390,9 @@ class Server::Implementation {
         }
     }
 
-    const ServerSettings settings_;
+    // Not constant, as the library takes its texts by pointers to plain char.
+    ServerSettings settings_;
+    std::string tlsPriorities_ = "NORMAL:-VERS-ALL:+VERS-TLS1.3:+VERS-TLS1.2";
     const ServerLog log_;
     Operations operations_;
     std::optional<Authenticator> authenticator_;
