@@ -101,7 +101,7 @@ class Examination {
         std::size_t files = 0;
         for (fs::directory_iterator entry(directory, error); !error && entry != end(entry);
              entry.increment(error)) {
-            files += entry->path().filename().string().starts_with("ifcfg-") ? 1 : 0;
+            files += entry->path().filename().string().starts_with("ifcfg-") ? 1U : 0U;
         }
         if (error) {
             add(Verdict::bad, "data directory", directory + ": " + error.message(),
