@@ -120,6 +120,22 @@ TEST_F(OverviewCommands, TreePrintsAJsonTreeThatCanBeReadBack) {
     EXPECT_EQ(run({"tree"}), first);
 }
 
+TEST_F(OverviewCommands, AnExplainedTreeSaysWhereEachPropertyOfTheLiveMachineCameFrom) {
+    const Ended explained = runAs(program(), {"tree", "--explain"});
+    EXPECT_EQ(explained.status, 0);
+    const auto json = nlohmann::json::parse(explained.out);
+    const auto& computer = json["nodes"][0];
+    ASSERT_FALSE(computer["properties"].empty());
+    for (const auto& [name, value] : computer["properties"].items()) {
+        EXPECT_EQ(computer["origins"].value(name, ""), "kernel: the name of the system") << name;
+    }
+    const Ended refused = run({"tree", "--explain"});
+    EXPECT_EQ(refused.status, 2);
+    EXPECT_EQ(refused.out, "");
+    EXPECT_EQ(refused.err,
+              "cimdhcp: only of the live machine it is known where properties came from\n");
+}
+
 TEST_F(OverviewCommands, ClassesListsWhatIsServed) {
     const Ended ended = run({"classes"});
     EXPECT_EQ(ended.status, 0);

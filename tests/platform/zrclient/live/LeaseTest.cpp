@@ -29,6 +29,24 @@ TEST(ClientFacts, AManagerOfAnotherNamespaceDoesNotRunHere) {
     EXPECT_FALSE(ClientFacts{}.runs(Client::Wicked));
 }
 
+TEST(ClientFacts, AManagerRunsElsewhereWhereItRunsInNoOtherPlace) {
+    using Where = ManagerProcess::Where;
+    ClientFacts facts = running(Client::Wicked, Where::Elsewhere);
+    EXPECT_TRUE(facts.runsElsewhere(Client::Wicked));
+    EXPECT_FALSE(facts.runsElsewhere(Client::Networkd));
+    facts.managers.push_back({.client = Client::Wicked, .where = Where::Here, .pid = 8});
+    EXPECT_FALSE(facts.runsElsewhere(Client::Wicked));
+    EXPECT_FALSE(ClientFacts{}.runsElsewhere(Client::Wicked));
+}
+
+TEST(ClientProcesses, WithoutAnInterfaceTheyServeAll) {
+    ClientProcess process{.client = Client::Dhclient, .interfaces = {}, .leaseFile = ""};
+    EXPECT_TRUE(process.serves("eth1"));
+    process.interfaces = {"eth2", "eth3"};
+    EXPECT_TRUE(process.serves("eth3"));
+    EXPECT_FALSE(process.serves("eth1"));
+}
+
 TEST(WatchedPlaces, AShorterPrefixCoversALongerOne) {
     const WatchedPlace place{.directory = "/d", .namePrefix = "a"};
     EXPECT_TRUE(place.covers({.directory = "/d", .namePrefix = "ab"}));

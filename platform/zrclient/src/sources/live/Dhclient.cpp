@@ -134,10 +134,7 @@ void addProcessFile(const Roots& roots, const ClientProcess& process, LeaseFiles
 
 bool keeps(const LeaseFile& file, const DhclientLease& lease) {
     return std::any_of(file.keepers.begin(), file.keepers.end(), [&](const ClientProcess* keeper) {
-        return keeper->ipv6 == lease.ipv6 &&
-               (keeper->interfaces.empty() ||
-                std::find(keeper->interfaces.begin(), keeper->interfaces.end(),
-                          lease.interfaceName) != keeper->interfaces.end());
+        return keeper->ipv6 == lease.ipv6 && keeper->serves(lease.interfaceName);
     });
 }
 

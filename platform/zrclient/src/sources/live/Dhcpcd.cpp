@@ -139,13 +139,10 @@ class Reader {
     }
 
     [[nodiscard]] bool runsOn(const std::string& interface) const {
-        return std::any_of(
-            facts_.processes.begin(), facts_.processes.end(), [&](const ClientProcess& process) {
-                return process.client == Client::Dhcpcd &&
-                       (process.interfaces.empty() ||
-                        std::find(process.interfaces.begin(), process.interfaces.end(),
-                                  interface) != process.interfaces.end());
-            });
+        return std::any_of(facts_.processes.begin(), facts_.processes.end(),
+                           [&](const ClientProcess& process) {
+                               return process.client == Client::Dhcpcd && process.serves(interface);
+                           });
     }
 
     ClientFacts& facts_;

@@ -32,10 +32,22 @@ std::string_view nameOf(Client client) noexcept {
     return "unknown";
 }
 
+bool ClientProcess::serves(std::string_view interface) const noexcept {
+    return interfaces.empty() ||
+           std::find(interfaces.begin(), interfaces.end(), interface) != interfaces.end();
+}
+
 bool ClientFacts::runs(Client client) const noexcept {
     return std::any_of(managers.begin(), managers.end(), [client](const ManagerProcess& manager) {
         return manager.client == client && manager.where != ManagerProcess::Where::Elsewhere;
     });
+}
+
+bool ClientFacts::runsElsewhere(Client client) const noexcept {
+    return !runs(client) &&
+           std::any_of(managers.begin(), managers.end(), [client](const ManagerProcess& manager) {
+               return manager.client == client;
+           });
 }
 
 }  // namespace ZR::Live

@@ -77,6 +77,9 @@ struct ClientProcess {
     bool ipv6 = false;                    ///< DHCPv6 in place of DHCPv4
     std::int32_t pid = 0;                 ///< process number; 0 before it is known
 
+    /// Whether it was told to serve this interface, or all.
+    [[nodiscard]] bool serves(std::string_view interface) const noexcept;
+
     bool operator==(const ClientProcess&) const = default;
 };
 
@@ -127,6 +130,10 @@ struct ClientFacts {
     /// Whether a program that manages links runs for this network namespace. One
     /// whose namespace is hidden is believed: the files that it left are beside ours.
     [[nodiscard]] bool runs(Client client) const noexcept;
+
+    /// Whether such a program runs for other network namespaces alone: the indexes in
+    /// its files are then those of other links.
+    [[nodiscard]] bool runsElsewhere(Client client) const noexcept;
 
     bool operator==(const ClientFacts&) const = default;
 };

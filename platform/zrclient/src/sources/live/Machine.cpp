@@ -34,11 +34,8 @@ void sortByIndex(std::vector<Fact>& facts) {
 }
 
 bool concerns(const ClientProcess& process, const Link& link) {
-    if (process.interfaces.empty()) {
-        return (link.flags & IFF_BROADCAST) != 0;
-    }
-    return std::find(process.interfaces.begin(), process.interfaces.end(), link.name) !=
-           process.interfaces.end();
+    const bool all = process.interfaces.empty();
+    return all ? (link.flags & IFF_BROADCAST) != 0 : process.serves(link.name);
 }
 
 /// Whether an address is what a client made of a lease, as far as their ends tell.

@@ -120,15 +120,10 @@ void addManagement(std::uint32_t ifindex, const NetworkManagerDevice& device,
 }
 
 void readDevices(const Roots& roots, const std::vector<ProfileFile>& profiles, ClientFacts& facts) {
-    const bool alive = facts.runs(Client::NetworkManager);
-    const bool elsewhere =
-        !alive && std::any_of(facts.managers.begin(), facts.managers.end(),
-                              [](const ManagerProcess& manager) {
-                                  return manager.client == Client::NetworkManager;
-                              });
-    if (elsewhere) {
-        return;  // the indexes are those of other links
+    if (facts.runsElsewhere(Client::NetworkManager)) {
+        return;
     }
+    const bool alive = facts.runs(Client::NetworkManager);
     const std::string devices = roots.path(networkManagerDevices);
     for (const std::string& name : listOptionalDirectory(devices, facts.complaints)) {
         const auto ifindex = parseNumber<std::uint32_t>(name);

@@ -243,13 +243,7 @@ void readNetworkd(const Roots& roots, ClientFacts& facts) {
     NetworkFiles files{roots, facts};
     const std::string links = roots.path(networkdLinksDirectory);
     const std::string leases = roots.path(networkdLeasesDirectory);
-    // Of a service that runs for other links only, these are other links' indexes.
-    const bool elsewhere =
-        !facts.runs(Client::Networkd) && std::any_of(facts.managers.begin(), facts.managers.end(),
-                                                     [](const ManagerProcess& manager) {
-                                                         return manager.client == Client::Networkd;
-                                                     });
-    if (elsewhere) {
+    if (facts.runsElsewhere(Client::Networkd)) {
         return;
     }
     std::vector<std::uint32_t> managed;

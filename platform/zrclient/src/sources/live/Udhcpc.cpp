@@ -28,12 +28,11 @@ constexpr std::array<std::string_view, 12> longWithValue{
     "interface", "client-port",    "script",  "pidfile", "retries",     "timeout",
     "tryagain",  "request-option", "request", "fqdn",    "vendorclass", "hostname"};
 
-bool runsOn(const ClientFacts& facts, const std::string& interface) {
-    return std::any_of(facts.processes.begin(), facts.processes.end(),
-                       [&](const ClientProcess& process) {
-                           return process.client == Client::Udhcpc && !process.ipv6 &&
-                                  process.interfaces.front() == interface;
-                       });
+bool runsOn(const ClientFacts& facts, std::string_view interface) {
+    return std::any_of(
+        facts.processes.begin(), facts.processes.end(), [&](const ClientProcess& process) {
+            return process.client == Client::Udhcpc && !process.ipv6 && process.serves(interface);
+        });
 }
 
 }  // namespace
@@ -92,7 +91,7 @@ void readUdhcpc(const Roots& roots, ClientFacts& facts) {
                                 .family = AF_INET,
                                 .address = std::move(address),
                                 .server = canonicalIPv4(lastValue(variables, "serverid")),
-                                .clientAlive = runsOn(facts, std::string{interface}),
+                                .clientAlive = runsOn(facts, interface),
                                 .expires = *lifetime == UINT32_MAX
                                                ? Lease::never
                                                : status.st_mtim.tv_sec + std::int64_t{*lifetime},
