@@ -101,7 +101,9 @@ class Examination {
         std::size_t files = 0;
         for (fs::directory_iterator entry(directory, error); !error && entry != end(entry);
              entry.increment(error)) {
-            files += entry->path().filename().string().starts_with("ifcfg-") ? 1U : 0U;
+            if (entry->path().filename().string().starts_with("ifcfg-")) {
+                ++files;
+            }
         }
         if (error) {
             add(Verdict::bad, "data directory", directory + ": " + error.message(),
@@ -127,7 +129,9 @@ class Examination {
             const auto* const property = snapshot->find(node, Properties::DHCPEnabled);
             const bool* const enabled =
                 property == nullptr ? nullptr : std::get_if<bool>(&property->value);
-            dhcpInterfaces_ += enabled != nullptr && *enabled ? 1 : 0;
+            if (enabled != nullptr && *enabled) {
+                ++dhcpInterfaces_;
+            }
         }
         const std::string where = tree.empty() ? "the live machine" : "tree " + tree;
         const std::string detail = where + " has " +
