@@ -33,7 +33,7 @@ TEST_F(Usage, HelpIsPrintedAndFitsATerminal) {
 TEST_F(Usage, MistakesAreStatusTwo) {
     const std::string hint = " (\"cimdhcp --help\" tells more)\n";
     EXPECT_EQ(plain({}), (Ended{2, "", "cimdhcp: a command is missing" + hint}));
-    EXPECT_EQ(plain({"walk"}), (Ended{2, "", "cimdhcp: there is no command \"walk\"" + hint}));
+    EXPECT_EQ(plain({"server"}), (Ended{2, "", "cimdhcp: there is no command \"server\"" + hint}));
     EXPECT_EQ(plain({"get"}), (Ended{2, "", "cimdhcp: PATH is required" + hint}));
     EXPECT_EQ(
         plain({"--format", "mof", "show"}),

@@ -114,8 +114,10 @@ TEST_F(ProcessesTest, AClientWhoseNamespaceIsForbiddenIsReported) {
     constexpr uid_t nobody = 65534;
     add("17", "dhclient", commandLine_);
     std::filesystem::permissions(proc_.path("/17/ns"), perms::none);
-    std::filesystem::permissions(proc_.path(), perms::others_read | perms::others_exec,
-                                 std::filesystem::perm_options::add);
+    std::filesystem::permissions(
+        proc_.path(),
+        perms::group_read | perms::group_exec | perms::others_read | perms::others_exec,
+        std::filesystem::perm_options::add);
     // Nothing is forbidden to root.
     const ZR::Testing::ChildResult other = ZR::Testing::inChild([this] {
         if (::geteuid() == 0 && ::setuid(nobody) != 0) {
