@@ -26,6 +26,9 @@ completes() { # WANTED WORD...
 
 completes 'show' sh
 completes 'rename references' re
+completes 'show serve' s
+completes 'add' user a
+completes '--users' user add --us
 completes 'table' --format ta
 completes '--format' --fo
 completes 'QVXZR_DHCPSettingData' names QVXZR_DHCPS

@@ -29,6 +29,7 @@ echo "== install"
 dpkg --install *.deb >/dev/null
 test -x /usr/bin/cimdhcp
 command -v cimdhcp
+grep -x 'ExecStart=/usr/bin/cimdhcp serve --read-only' /usr/lib/systemd/system/cimdhcp.service
 for page in man1/cimdhcp.1 man5/zr-platform.conf.5 man8/provider-register.sh.8; do
     test -s /usr/share/man/$page.gz
 done
@@ -78,6 +79,7 @@ unshare --mount bash "$directory/outside" "$directory" >"$directory/output" 2>"$
 cat >"$directory/expected" <<'TEXT'
 == install
 /usr/bin/cimdhcp
+ExecStart=/usr/bin/cimdhcp serve --read-only
 == use
 INTERFACE  DHCP  STATE   ADDRESS        SERVERS                 CONFIGURATION NAME
 eth0       on    bound   192.0.2.17     192.0.2.1, 2001:db8::1  old

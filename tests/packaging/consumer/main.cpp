@@ -14,6 +14,6 @@ int main() {
             std::puts(name.c_str());
         }
     }
-    std::printf("%u\n", static_cast<unsigned>(
-                            ZR::ProviderUtilities::getClassId("QVXZR_DHCPSettingData")));
+    std::printf("%u\n",
+                static_cast<unsigned>(ZR::ProviderUtilities::getClassId("QVXZR_DHCPSettingData")));
 }
