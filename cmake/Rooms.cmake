@@ -25,7 +25,7 @@ target_compile_options(zr_options INTERFACE
 
 if(ZR_SANITIZERS)
     add_compile_options(-fsanitize=${ZR_SANITIZERS} -fno-sanitize-recover=all
-                        -fno-omit-frame-pointer -O1)
+                        -fno-omit-frame-pointer -O1 -g1)
     add_link_options(-fsanitize=${ZR_SANITIZERS})
     # The check of virtual tables looks at memory through a pipe, and reports a fault
     # when a test has taken all descriptors away.
@@ -72,11 +72,15 @@ function(zr_provider_library name)
             COMPONENT ${LIBRARY_COMPONENT})
 endfunction()
 
-# What tests are built for is to run once: optimising them costs more than it saves.
+# What tests are built for is to run once: optimising them costs more than it saves,
+# most of all when each check of a sanitizer is optimised, too.
 # g++ 12 sees null pointers in the standard library's streams where there are none.
 add_library(test_options INTERFACE)
 target_compile_options(test_options INTERFACE
     $<$<CONFIG:Release>:-O1> $<$<CXX_COMPILER_ID:GNU>:-Wno-null-dereference>)
+if(ZR_SANITIZERS)
+    target_compile_options(test_options INTERFACE -O0)
+endif()
 
 # The headers that every test includes, compiled once: most of a test's compile
 # time would go into them.
