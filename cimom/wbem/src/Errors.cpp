@@ -2,31 +2,14 @@
 
 #include <array>
 
+#include "cimom/Cim.h"
+
 namespace cimom::wbem {
 
 std::string_view cimStatusName(unsigned code) noexcept {
-    // Indexed by the code; 0, 18 and 19 are no status codes.
-    static constexpr std::array<std::string_view, 30> names{
-        "",
-        "CIM_ERR_FAILED",
-        "CIM_ERR_ACCESS_DENIED",
-        "CIM_ERR_INVALID_NAMESPACE",
-        "CIM_ERR_INVALID_PARAMETER",
-        "CIM_ERR_INVALID_CLASS",
-        "CIM_ERR_NOT_FOUND",
-        "CIM_ERR_NOT_SUPPORTED",
-        "CIM_ERR_CLASS_HAS_CHILDREN",
-        "CIM_ERR_CLASS_HAS_INSTANCES",
-        "CIM_ERR_INVALID_SUPERCLASS",
-        "CIM_ERR_ALREADY_EXISTS",
-        "CIM_ERR_NO_SUCH_PROPERTY",
-        "CIM_ERR_TYPE_MISMATCH",
-        "CIM_ERR_QUERY_LANGUAGE_NOT_SUPPORTED",
-        "CIM_ERR_INVALID_QUERY",
-        "CIM_ERR_METHOD_NOT_AVAILABLE",
-        "CIM_ERR_METHOD_NOT_FOUND",
-        "",
-        "",
+    // The statuses of the pull operations follow those that CMPI knows, too.
+    constexpr unsigned first = 20;
+    static constexpr std::array<std::string_view, 10> names{
         "CIM_ERR_NAMESPACE_NOT_EMPTY",
         "CIM_ERR_INVALID_ENUMERATION_CONTEXT",
         "CIM_ERR_INVALID_OPERATION_TIMEOUT",
@@ -38,8 +21,11 @@ std::string_view cimStatusName(unsigned code) noexcept {
         "CIM_ERR_SERVER_IS_SHUTTING_DOWN",
         "CIM_ERR_QUERY_FEATURE_NOT_SUPPORTED",
     };
-    const bool known = code < names.size() && !names.at(code).empty();
-    return names.at(known ? code : 1);
+    if (code >= first && code < first + names.size()) {
+        return names.at(code - first);
+    }
+    const bool unknown = code == 0 || code >= first;
+    return statusName(unknown ? CMPI_RC_ERR_FAILED : static_cast<CMPIrc>(code));
 }
 
 }  // namespace cimom::wbem

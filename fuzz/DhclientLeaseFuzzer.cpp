@@ -1,0 +1,8 @@
+#include "DhclientLease.h"
+
+#include "Input.h"
+
+int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
+    static_cast<void>(ZR::Live::parseDhclientLeases(fuzz::text(data, size)));
+    return 0;
+}

@@ -1,0 +1,9 @@
+#include "NetworkManager.h"
+
+#include "Input.h"
+
+int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
+    static_cast<void>(ZR::Live::parseNetworkManagerDevice(fuzz::text(data, size)));
+    static_cast<void>(ZR::Live::parseNetworkManagerProfile(fuzz::text(data, size)));
+    return 0;
+}

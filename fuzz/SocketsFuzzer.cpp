@@ -1,0 +1,9 @@
+#include "Sockets.h"
+
+#include "Input.h"
+
+int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
+    static_cast<void>(ZR::Live::parseUdpSockets(fuzz::text(data, size)));
+    static_cast<void>(ZR::Live::parsePacketLinks(fuzz::text(data, size)));
+    return 0;
+}
