@@ -32,7 +32,7 @@ Client::Client(const Directories& directories, std::string nameSpace)
     configuration.registrationFiles = registrationFiles(directories.registrations);
     configuration.providerDirectories = directories.providers;
     try {
-        manager_.emplace(std::move(configuration));
+        manager_ = std::make_unique<cimom::ObjectManager>(std::move(configuration));
     } catch (const cimom::MofError& error) {
         throw Failure(ExitStatus::notLoaded, printable(error.what()));
     } catch (const cimom::LoadError& error) {

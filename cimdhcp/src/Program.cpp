@@ -1,5 +1,6 @@
 #include "cimdhcp/Program.h"
 
+#include <chrono>
 #include <exception>
 #include <ostream>
 #include <type_traits>
@@ -32,6 +33,9 @@
 namespace cimdhcp {
 
 namespace {
+
+/// How long the service processor may take.
+constexpr std::chrono::seconds patience(1);
 
 /// Runs one command line.
 class Execution {
@@ -72,6 +76,7 @@ class Execution {
             }
             service.useSource(ZR::openLiveSource(ZR::Explain::Yes));
         }
+        service.settle(patience);
         outputs_.out << ZR::toJson(*service.current());
     }
 
@@ -115,7 +120,23 @@ class Execution {
     [[nodiscard]] bool json() const { return options_.format == Format::json; }
 
     [[nodiscard]] Client openClient() const {
-        return {findDirectories(options_, installations(executableFile())), options_.nameSpace};
+        Client client{findDirectories(options_, installations(executableFile())),
+                      options_.nameSpace};
+        awaitServiceProcessor(client);
+        return client;
+    }
+
+    /// The service processor answers when it likes, and no request waits for it. This
+    /// program ends after one request: the provider is made to ask, then a question is
+    /// asked behind its own, and the answer to that one awaited.
+    static void awaitServiceProcessor(Client& client) {
+        auto& machine = ZR::InstrumentationService::process();
+        static_cast<void>(machine.current());
+        if (!machine.awaiting()) {
+            return;
+        }
+        static_cast<void>(client.enumerateNames(client.classPath("QVXZR_DHCPProtocolEndpoint")));
+        ZR::InstrumentationService(ZR::openLiveSource()).settle(patience);
     }
 
     [[nodiscard]] std::string formatted(const Answer& answer, const Client& client) const {

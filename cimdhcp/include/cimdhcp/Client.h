@@ -1,6 +1,6 @@
 #pragma once
 
-#include <optional>
+#include <memory>
 #include <string>
 #include <vector>
 
@@ -46,7 +46,7 @@ class Client {
 
   private:
     std::string nameSpace_;
-    std::optional<cimom::ObjectManager> manager_;
+    std::unique_ptr<cimom::ObjectManager> manager_;  // never null
 };
 
 }  // namespace cimdhcp

@@ -1,5 +1,6 @@
 #include "zrclient/InstrumentationService.h"
 
+#include <thread>
 #include <utility>
 
 #include "sources/JsonTreeSource.h"
@@ -61,6 +62,21 @@ std::shared_ptr<const Snapshot> InstrumentationService::current() {
         }
     }
     return readSource();
+}
+
+bool InstrumentationService::awaiting() {
+    const std::lock_guard lock(sourceMutex_);
+    return source_ && source_->awaiting();
+}
+
+void InstrumentationService::settle(std::chrono::milliseconds limit) {
+    constexpr std::chrono::milliseconds pause(5);
+    const auto end = std::chrono::steady_clock::now() + limit;
+    static_cast<void>(current());
+    while (awaiting() && std::chrono::steady_clock::now() < end) {
+        std::this_thread::sleep_for(pause);
+        static_cast<void>(current());
+    }
 }
 
 std::shared_ptr<const Snapshot> InstrumentationService::latest() {

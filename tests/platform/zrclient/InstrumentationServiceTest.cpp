@@ -90,6 +90,37 @@ TEST(InstrumentationService, AReplacedSnapshotEndsWithItsLastCursor) {
 }
 
 /// Stands in for a slow source: a reading takes until the test lets it end.
+/// Awaits an answer until it was polled a number of times.
+class AwaitingSource : public SnapshotSource {
+  public:
+    explicit AwaitingSource(int polls) : polls_(polls) {}
+    bool changed() override {
+        polls_ -= polls_ > 0 ? 1 : 0;
+        return polls_ == 0;
+    }
+    [[nodiscard]] bool awaiting() const override { return polls_ > 0; }
+    std::shared_ptr<const Snapshot> read() override {
+        return tree(awaiting() ? "asked" : "answered");
+    }
+
+  private:
+    int polls_;
+};
+
+TEST(InstrumentationService, SettlesWhenTheAnswerIsThere) {
+    InstrumentationService service(std::make_unique<AwaitingSource>(3));
+    service.settle(std::chrono::hours(1));
+    EXPECT_FALSE(service.awaiting());
+    EXPECT_EQ(service.latest()->node(0).description, "answered");
+}
+
+TEST(InstrumentationService, SettlesForWhatThereIsInTheEnd) {
+    InstrumentationService service(std::make_unique<AwaitingSource>(1'000'000));
+    service.settle(std::chrono::milliseconds(20));
+    EXPECT_TRUE(service.awaiting());
+    EXPECT_EQ(service.latest()->node(0).description, "asked");
+}
+
 class SlowSource : public SnapshotSource {
   public:
     struct State {

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <atomic>
+#include <chrono>
 #include <cstdint>
 #include <memory>
 #include <mutex>
@@ -24,6 +25,13 @@ class InstrumentationService {
 
     /// The newest state: polls the source, and reads it when it changed.
     [[nodiscard]] std::shared_ptr<const Snapshot> current();
+
+    /// Waits until the source awaits no answer any more, at most that long. No request
+    /// needs this; it is for a program that ends after one.
+    void settle(std::chrono::milliseconds limit);
+
+    /// Whether the source awaits an answer.
+    [[nodiscard]] bool awaiting();
 
     /// The state that was read last, without polling; reads once if there is none.
     [[nodiscard]] std::shared_ptr<const Snapshot> latest();

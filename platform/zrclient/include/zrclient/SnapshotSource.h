@@ -20,6 +20,10 @@ class SnapshotSource {
     /// awaited. True before the first read.
     [[nodiscard]] virtual bool changed() = 0;
 
+    /// Whether an answer is on its way that a later read() will give: one that may be
+    /// slow is never waited for.
+    [[nodiscard]] virtual bool awaiting() const { return false; }
+
     /// Reads the present state. Never throws and never returns null: what cannot
     /// be read is logged and left out. Takes at most 250 ms.
     [[nodiscard]] virtual std::shared_ptr<const Snapshot> read() = 0;

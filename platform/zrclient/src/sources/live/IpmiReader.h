@@ -37,6 +37,9 @@ class IpmiReader {
     /// once a minute.
     [[nodiscard]] bool changed();
 
+    /// Whether questions are out that may still be answered.
+    [[nodiscard]] bool awaiting() const noexcept { return conversation_.has_value(); }
+
     /// What is known; nullopt when the machine has no service processor. Adds what
     /// stands in the way of knowing more.
     [[nodiscard]] std::optional<ServiceProcessor> read(std::vector<std::string>& complaints);

@@ -51,6 +51,14 @@ TEST_F(IpmiReaderTest, TheProcessorIsThereAtOnceAndItsChannelLater) {
     EXPECT_FALSE(processor_.isOpen) << "nothing stays open in between";
 }
 
+TEST_F(IpmiReaderTest, TellsWhetherAnswersAreAwaited) {
+    EXPECT_FALSE(reader_.awaiting()) << "nothing was asked yet";
+    EXPECT_EQ(read(), ServiceProcessor{});
+    EXPECT_TRUE(reader_.awaiting());
+    EXPECT_EQ(settled(), known);
+    EXPECT_FALSE(reader_.awaiting());
+}
+
 TEST_F(IpmiReaderTest, IsAskedAtMostOnceAMinute) {
     EXPECT_EQ(settled(), known);
     const auto calls = processor_.asked.size();
