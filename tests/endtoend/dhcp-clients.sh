@@ -1,7 +1,8 @@
 #!/usr/bin/env bash
-# The life of a lease with one of the DHCP clients of Debian: lease, loss of the
-# cable, a new name of the link, release, and removal of the link. After each step, what
-# the program shows is compared with what the kernel and the client say.
+# The life of a lease with one of the DHCP clients of Debian: lease, loss of the cable,
+# renewal, another server, a new name of the link, release, and removal of the link.
+# After each step, what the program shows is compared with what the kernel and the
+# client say.
 #
 # Usage: dhcp-clients.sh PATH-OF-cimdhcp CLIENT
 # CLIENT: dhclient, dhcpcd, udhcpc, networkd, NetworkManager or NetworkManager-dhclient
@@ -26,8 +27,8 @@ write_in_client() {
     in_client sh -c 'mkdir -p "$(dirname "$1")" && cat >"$1"' sh "$1"
 }
 
-# Each client has: start_client, stop_client (with a release), and what it says itself:
-# said_address and said_server, of the interface $1. A client that cannot follow a new
+# Each client has: start_client, stop_client (with a release), renew_client (unless it
+# can only wait until half of the time is over), and what it says itself: said_address and said_server, of the interface $1. A client that cannot follow a new
 # name says what it said before.
 case $kind in
     dhclient)
@@ -45,6 +46,10 @@ case $kind in
         said_address() { said fixed-address; }
         said_server() { said 'option dhcp-server-identifier'; }
         # It would give the lease back under a name that the link no longer has.
+        renew_client() {
+            in_client dhclient -x -q -pf "$work/client.pid" eth1 </dev/null >"$work/client.log" 2>&1
+            start_client
+        }
         renamed_back=yes
         ;;
     dhcpcd)
@@ -62,6 +67,7 @@ case $kind in
         }
         said_address() { said ip_address; }
         said_server() { said dhcp_server_identifier; }
+        renew_client() { in_client dhcpcd -4 -n eth1 </dev/null >"$work/client.log" 2>&1; }
         renamed_back=yes
         ;;
     udhcpc)
@@ -93,6 +99,7 @@ HOOK
         }
         said_address() { said ip; }
         said_server() { said serverid; }
+        renew_client() { kill -USR1 "$(<"$work/client.pid")"; }
         renamed_back=yes
         ;;
     networkd)
@@ -176,6 +183,8 @@ FILE
         stop_client() {
             in_client nmcli connection down office
         }
+        renew_client() { restart_client; }
+        restart_client() { in_client nmcli connection up office >"$work/client.log" 2>&1; }
         said() {
             in_client nmcli -t -f DHCP4 device show "$current" | sed -n "s/^DHCP4.OPTION\[[0-9]*\]:$1 = //p"
         }
@@ -210,7 +219,24 @@ agrees() {
         [[ $(seen DHCPEnabled "$current") == true ]] || return 1
         [[ $(said_address) == "$address" ]] && expected="[\"$(said_server)\"]"
     fi
-    [[ $(seen DHCPServerAddresses "$current") == "$expected" ]]
+    [[ $(seen DHCPServerAddresses "$current") == "$expected" ]] || return 1
+    served "$address" "$expected"
+}
+# served ADDRESS SERVERS: the endpoint, the access points and the setting data say so, too.
+served() {
+    local on
+    on=$(seen DHCPEnabled "$current")
+    [[ $(instances QVXZR_DHCPProtocolEndpoint Name "$current") == "$([[ $on != true ]] || echo "\"$current\"")" ]] ||
+        return 1
+    [[ $(instances QVXZR_DHCPRemoteServiceAccessPoint AccessInfo "${current}_IPv4") == \
+        "$(jq -r '.[] | tojson' <<<"$2")" ]] || return 1
+    [[ $(instances QVXZR_DHCPSettingData RequestedIPv4Address "$current") == "${1:+"\"$1\""}" ]]
+}
+# instances CLASS PROPERTY NAME: the property of those that are named, one per line.
+instances() {
+    cimdhcp --format json instances "$1" 2>/dev/null |
+        jq -c --arg property "$2" --arg name "$3" '.instances[].properties
+            | select((.Name // .ElementName).value == $name) | .[$property].value | values'
 }
 explain() {
     echo "--- the program:"; cimdhcp tree
@@ -253,12 +279,30 @@ ip -n "$client" link set cable up
 eventually leased || { explain; fail "$kind gets no lease again"; }
 step "with the cable in again"
 
+if declare -F renew_client >/dev/null; then
+    before=$(lease_end)
+    sleep 1  # ends are told in seconds
+    renew_client || { explain; fail "$kind does not renew its lease"; }
+    renewed() { [[ $(lease_end) -gt $before ]] && leased; }
+    eventually renewed || { explain; fail "$kind has not renewed its lease"; }
+    step "renewed"
+fi
+
+stop_client eth1 || fail "$kind does not give the first lease back"
+eventually no_address eth1 || { explain; fail "$kind keeps the first address"; }
+change_server
+if declare -F restart_client >/dev/null; then restart_client; else start_client; fi ||
+    { explain; fail "$kind does not start again"; }
+eventually leased || { explain; fail "$kind gets no lease from another server"; }
+step "with another server"
+[[ $(value DHCPServerAddresses) == '["198.51.100.2"]' ]] || fail "the former server shows"
+
 ip -n "$client" link set eth1 name lan0
 current=lan0
 step "under another name"
 [[ -z $(value Name eth1) ]] || fail "the former name shows"
 if [[ $renamed_back == yes ]]; then
-    [[ $(value DHCPServerAddresses lan0) == '["198.51.100.1"]' ]] || fail "the lease got lost"
+    [[ $(value DHCPServerAddresses lan0) == '["198.51.100.2"]' ]] || fail "the lease got lost"
     ip -n "$client" link set lan0 name eth1
     current=eth1
 fi

@@ -101,6 +101,19 @@ start_server() {
     disown  # its end is no news
 }
 
+# Another server takes the place of the first: 198.51.100.2, with the same addresses to give.
+change_server() {
+    kill "$(<"$work/dnsmasq.pid")"
+    eventually test ! -e "$work/dnsmasq.pid"
+    ip -n "$server" address delete 198.51.100.1/24 dev zrs$$
+    ip -n "$server" address add 198.51.100.2/24 dev zrs$$
+    start_server
+}
+# When the server's only lease ends, in seconds since the epoch.
+lease_end() {
+    cut -d ' ' -f 1 "$work/server.leases"
+}
+
 # look: reads the machine once. seen PROPERTY [INTERFACE]: what was seen then, as compact
 # JSON; nothing when the interface or the property is not there.
 look() {
