@@ -7,11 +7,12 @@
 namespace cimom::wbem {
 
 TEST(TaskPool, RunsTasksOnItsThreads) {
-    TaskPool pool(2, 10);
+    // Declared before the pool, as what its tasks use has to outlive it.
     std::promise<void> both;
     std::atomic<int> arrived{0};
     std::promise<void> go;
     const std::shared_future<void> gone = go.get_future().share();
+    TaskPool pool(2, 10);
     for (int count = 0; count < 2; ++count) {
         pool.run([&, gone] {
             if (++arrived == 2) {
@@ -25,9 +26,9 @@ TEST(TaskPool, RunsTasksOnItsThreads) {
 }
 
 TEST(TaskPool, LetsOnlySoManyWait) {
-    TaskPool pool(1, 2);
     std::promise<void> running;
     std::promise<void> go;
+    TaskPool pool(1, 2);
     EXPECT_TRUE(pool.run([&] {
         running.set_value();
         go.get_future().wait();
@@ -40,9 +41,9 @@ TEST(TaskPool, LetsOnlySoManyWait) {
 }
 
 TEST(TaskPool, RunsTasksNoEarlierThanTheyShould) {
-    TaskPool pool(1, 2);
     const auto start = TaskPool::Clock::now();
     std::promise<TaskPool::Clock::time_point> run;
+    TaskPool pool(1, 2);
     pool.runAfter(std::chrono::hours(1), [] { FAIL() << "an hour early"; });
     pool.runAfter(std::chrono::milliseconds(20), [&] { run.set_value(TaskPool::Clock::now()); });
     EXPECT_GE(run.get_future().get() - start, std::chrono::milliseconds(20));
