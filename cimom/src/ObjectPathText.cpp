@@ -175,8 +175,11 @@ class PathReader {
             // from_chars knows no plus sign.
             return readWhole<double>(word.front() == '+' ? digits : word, Type::real64);
         }
-        return word.front() == '-' ? readWhole<std::int64_t>(word, Type::sint64)
-                                   : readWhole<std::uint64_t>(digits, Type::uint64);
+        // Only what is below zero needs a sign: -0 is written as 0, and reads as that.
+        const bool below =
+            word.front() == '-' && digits.find_first_not_of('0') != std::string::npos;
+        return below ? readWhole<std::int64_t>(word, Type::sint64)
+                     : readWhole<std::uint64_t>(digits, Type::uint64);
     }
 
     template <typename Number>

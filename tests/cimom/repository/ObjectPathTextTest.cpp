@@ -53,6 +53,7 @@ TEST(ObjectPathText, ReadsEveryKindOfValue) {
     EXPECT_EQ(onlyKey("\"a\\\"b\\\\c,d.e=f\""), Value::ofString("a\"b\\c,d.e=f"));
     EXPECT_EQ(onlyKey("TRUE"), (Value{Type::boolean, false, Scalar(true)}));
     EXPECT_EQ(onlyKey("false"), (Value{Type::boolean, false, Scalar(false)}));
+    EXPECT_EQ(onlyKey("-0"), number(0));
     EXPECT_EQ(onlyKey("18446744073709551615"), number(std::numeric_limits<std::uint64_t>::max()));
     EXPECT_EQ(onlyKey("+5"), number(5));
     EXPECT_EQ(onlyKey("-9223372036854775808"),
