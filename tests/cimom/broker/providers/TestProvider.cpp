@@ -11,7 +11,22 @@
 
 namespace {
 
-const CMPIBroker* broker = nullptr;
+/// The broker of the last factory call. One factory may run while requests that came
+/// by the other are served.
+class LastBroker {
+  public:
+    LastBroker& operator=(const CMPIBroker* broker) {
+        broker_ = broker;
+        return *this;
+    }
+    operator const CMPIBroker*() const { return broker_; }
+    const CMPIBroker* operator->() const { return broker_; }
+
+  private:
+    std::atomic<const CMPIBroker*> broker_ = nullptr;
+};
+
+LastBroker broker;
 
 std::mutex logMutex;
 std::string callLog;
