@@ -130,9 +130,7 @@ class Execution {
     /// program ends after one request: the provider is made to ask, then a question is
     /// asked behind its own, and the answer to that one awaited.
     static void awaitServiceProcessor(Client& client) {
-        auto& machine = ZR::InstrumentationService::process();
-        static_cast<void>(machine.current());
-        if (!machine.awaiting()) {
+        if (!ZR::InstrumentationService::process().awaiting()) {
             return;
         }
         static_cast<void>(client.enumerateNames(client.classPath("QVXZR_DHCPProtocolEndpoint")));

@@ -66,7 +66,10 @@ std::shared_ptr<const Snapshot> InstrumentationService::current() {
 
 bool InstrumentationService::awaiting() {
     const std::lock_guard lock(sourceMutex_);
-    return source_ && source_->awaiting();
+    if (!source_) {
+        source_ = openSourceOfSettings();
+    }
+    return source_->awaiting();
 }
 
 void InstrumentationService::settle(std::chrono::milliseconds limit) {

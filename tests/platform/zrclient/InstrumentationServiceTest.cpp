@@ -98,7 +98,7 @@ class AwaitingSource : public SnapshotSource {
         polls_ -= polls_ > 0 ? 1 : 0;
         return polls_ == 0;
     }
-    [[nodiscard]] bool awaiting() const override { return polls_ > 0; }
+    [[nodiscard]] bool awaiting() override { return polls_ > 0; }
     std::shared_ptr<const Snapshot> read() override {
         return tree(awaiting() ? "asked" : "answered");
     }
@@ -112,6 +112,12 @@ TEST(InstrumentationService, SettlesWhenTheAnswerIsThere) {
     service.settle(std::chrono::hours(1));
     EXPECT_FALSE(service.awaiting());
     EXPECT_EQ(service.latest()->node(0).description, "answered");
+}
+
+TEST(InstrumentationService, TellsWithoutAReadingThatAnAnswerIsAwaited) {
+    InstrumentationService service(std::make_unique<AwaitingSource>(3));
+    EXPECT_TRUE(service.awaiting());
+    EXPECT_EQ(service.readings(), 0U);
 }
 
 TEST(InstrumentationService, SettlesForWhatThereIsInTheEnd) {

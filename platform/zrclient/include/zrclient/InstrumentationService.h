@@ -30,7 +30,7 @@ class InstrumentationService {
     /// needs this; it is for a program that ends after one.
     void settle(std::chrono::milliseconds limit);
 
-    /// Whether the source awaits an answer.
+    /// Whether the source awaits an answer, for which it may ask now. Reads nothing.
     [[nodiscard]] bool awaiting();
 
     /// The state that was read last, without polling; reads once if there is none.

@@ -21,8 +21,8 @@ class SnapshotSource {
     [[nodiscard]] virtual bool changed() = 0;
 
     /// Whether an answer is on its way that a later read() will give: one that may be
-    /// slow is never waited for.
-    [[nodiscard]] virtual bool awaiting() const { return false; }
+    /// slow is never waited for. Asks for it if that is due; reads nothing else.
+    [[nodiscard]] virtual bool awaiting() { return false; }
 
     /// Reads the present state. Never throws and never returns null: what cannot
     /// be read is logged and left out. Takes at most 250 ms.

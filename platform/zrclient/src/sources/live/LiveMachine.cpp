@@ -91,6 +91,12 @@ bool LiveMachine::changed() {
     return processor_.changed() || monitor_.changed();
 }
 
+bool LiveMachine::awaiting() {
+    // Whether there is something new is for changed() to tell.
+    static_cast<void>(processor_.changed());
+    return processor_.awaiting();
+}
+
 std::shared_ptr<const Snapshot> LiveMachine::read() {
     ClientFacts clients = readClients();
     consultNetworkd(clients);

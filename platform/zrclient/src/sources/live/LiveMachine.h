@@ -49,7 +49,7 @@ class LiveMachine final : public SnapshotSource {
     explicit LiveMachine(Surroundings surroundings);
 
     [[nodiscard]] bool changed() override;
-    [[nodiscard]] bool awaiting() const override { return processor_.awaiting(); }
+    [[nodiscard]] bool awaiting() override;
     [[nodiscard]] std::shared_ptr<const Snapshot> read() override;
 
   private:

@@ -87,6 +87,13 @@ TEST_F(ServiceProcessorMachineTest, StandsBesideTheComputerWithItsInterface) {
     EXPECT_THAT(complaints_, IsEmpty());
 }
 
+TEST_F(ServiceProcessorMachineTest, IsAskedWithoutAReading) {
+    LiveMachine& machine = withProcessor();
+    EXPECT_TRUE(machine.awaiting());
+    EXPECT_FALSE(machine.awaiting()) << "answered meanwhile";
+    EXPECT_THAT(interfaceNames(*machine.read()), ElementsAre("eth1", "bmc-lan1"));
+}
+
 TEST_F(ServiceProcessorMachineTest, NoReadingWaitsForIt) {
     processor_.silent = true;
     LiveMachine& machine = withProcessor();
