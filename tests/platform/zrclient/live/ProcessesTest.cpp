@@ -142,6 +142,45 @@ TEST_F(ProcessesTest, WhatIsNoProcessIsNotLookedAt) {
     EXPECT_THAT(read().processes, IsEmpty());
 }
 
+// A client's name on a thread of the kernel shows whether it was looked at.
+TEST_F(ProcessesTest, ThreadsOfTheKernelAreNotLookedAt) {
+    proc_.write("/2/stat", "2 (k) thr ead) S 0 0 0 0 -1 2129984 0 0\n");
+    proc_.write("/2/task/2/children", "17 4 ");
+    add("4", "dhclient", commandLine_);
+    add("17", "dhclient", commandLine_);
+    add("174", "dhclient", commandLine_);
+    const ClientFacts facts = read();
+    ASSERT_EQ(facts.processes.size(), 1U);
+    EXPECT_EQ(facts.processes[0].pid, 174);
+}
+
+TEST_F(ProcessesTest, ChildrenOfAProgramWithTheKernelsNumberAreLookedAt) {
+    for (const char* status : {"2 (kthreadd) S 0 0 0 0 -1 4194560 0 0\n", "2 (kthreadd) S 0",
+                               "2 kthreadd S 0 0 0 0 -1 2129984 0 0\n", ""}) {
+        proc_.write("/2/stat", status);
+        proc_.write("/2/task/2/children", "17 ");
+        add("17", "dhclient", commandLine_);
+        EXPECT_EQ(read().processes.size(), 1U) << status;
+        std::filesystem::remove_all(proc_.path("/17"));
+    }
+}
+
+TEST_F(ProcessesTest, AnyListOfThreadsOfTheKernelIsRead) {
+    proc_.write("/2/stat", "2 (kthreadd) S 0 0 0 0 -1 2129984 0 0\n");
+    add("17", "dhclient", commandLine_);
+    EXPECT_EQ(read().processes.size(), 1U) << "the kernel need not tell";
+    std::string many;
+    for (int number = 100; number < 5'000; ++number) {
+        many += std::to_string(number) + " ";
+    }
+    for (const std::string& children : {std::string{"x 17x  -3 99999999999 "}, many}) {
+        proc_.write("/2/task/2/children", children);
+        EXPECT_EQ(read().processes.size(), 1U);
+        proc_.write("/2/task/2/children", children + "17 ");
+        EXPECT_THAT(read().processes, IsEmpty());
+    }
+}
+
 TEST_F(ProcessesTest, WithoutAProcessFileSystemThereIsAReason) {
     ClientFacts facts;
     readProcesses({.files = "", .proc = proc_.path("/none")}, facts);
