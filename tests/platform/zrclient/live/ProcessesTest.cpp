@@ -101,12 +101,14 @@ TEST_F(ProcessesTest, ManagersAreToldWithWhereTheyRun) {
     add("11", "systemd-network", "/lib/systemd/systemd-networkd");
     add("12", "NetworkManager", "/usr/sbin/NetworkManager", "net:[2]");
     add("13", "wickedd-dhcp4", "", nullptr);
+    add("14", "connmand", "/usr/sbin/connmand");
     EXPECT_THAT(
         read().managers,
         testing::UnorderedElementsAre(
             ManagerProcess{.client = Client::Networkd, .where = Where::Here, .pid = 11},
             ManagerProcess{.client = Client::NetworkManager, .where = Where::Elsewhere, .pid = 12},
-            ManagerProcess{.client = Client::Wicked, .where = Where::Unknown, .pid = 13}));
+            ManagerProcess{.client = Client::Wicked, .where = Where::Unknown, .pid = 13},
+            ManagerProcess{.client = Client::Connman, .where = Where::Here, .pid = 14}));
 }
 
 TEST_F(ProcessesTest, AClientWhoseNamespaceIsForbiddenIsReported) {

@@ -47,10 +47,11 @@ struct KnownManager {
     std::string_view name;  // as /proc/PID/comm has it: at most 15 bytes
     Client client;
 };
-constexpr std::array<KnownManager, 3> knownManagers{{
+constexpr std::array<KnownManager, 4> knownManagers{{
     {"systemd-network", Client::Networkd},  // systemd-networkd, cut off
     {"NetworkManager", Client::NetworkManager},
     {"wickedd-dhcp4", Client::Wicked},
+    {"connmand", Client::Connman},
 }};
 
 struct CloseDirectory {
