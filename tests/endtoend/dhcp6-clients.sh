@@ -92,7 +92,7 @@ eventually link_local || { explain; fail "no address of the link"; }
 eventually shows false || { explain; fail "DHCP without a client"; }
 
 start_client || { explain; fail "$kind does not start"; }
-eventually leased6 || eventually leased6 || { explain; fail "$kind gets no lease"; }
+eventually leased6 || { explain; fail "$kind gets no lease"; }
 eventually shows true || { explain; fail "$kind: the program shows something else"; }
 expect "$kind" cimdhcp tree --explain
 
