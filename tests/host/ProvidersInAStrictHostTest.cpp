@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 
 #include <atomic>
+#include <filesystem>
 #include <fstream>
 #include <iterator>
 #include <memory>
@@ -13,6 +14,7 @@
 #include "StrictHost.h"
 #include "Tree.h"
 #include "cimom/ObjectPathText.h"
+#include "support/TemporaryDirectory.h"
 
 namespace {
 
@@ -144,6 +146,19 @@ TEST_F(ProvidersInAStrictHostTest, AnswerEveryRequestAsInTheEmbeddedObjectManage
 
 TEST_F(ProvidersInAStrictHostTest, AnswerTheSameWhenSymbolsAreBoundLateAndContextsAreEmpty) {
     StrictHost host = makeHost(Binding::lazy, Contexts::empty);
+    expectTheSame(host);
+}
+
+TEST_F(ProvidersInAStrictHostTest, AnswerTheSameOverTheFullSchemaWithItsDefaults) {
+    const ZR::Testing::TemporaryDirectory directory;
+    for (const char* file :
+         {"schema/01-qualifiers.mof", "tests/schema/cim-2.41.mof", "schema/10-dhcp-client.mof"}) {
+        const std::filesystem::path source = std::filesystem::path(ZR_SOURCE_DIR) / file;
+        std::filesystem::copy(
+            source, directory / (source.filename() == "cim-2.41.mof" ? "02-cim-2.41.mof"
+                                                                     : source.filename().string()));
+    }
+    StrictHost host(directory.path().string(), registrationFiles, libraryDirectory);
     expectTheSame(host);
 }
 

@@ -17,8 +17,9 @@ namespace strict {
 /// real ones do. Its libraries are opened with RTLD_GLOBAL; its broker tells version 0
 /// and has slots that are null; requests for a superclass become one call per
 /// registered class; association requests without a known class reach each provider
-/// once; nothing that a client sends is checked or filtered on its way. What a
-/// provider may not do is a violation.
+/// once; nothing that a client sends is checked or filtered on its way; properties that
+/// stay unset show the default that the schema declares. What a provider may not do is
+/// a violation.
 ///
 /// Requests may come from many threads; loading and unloading may not.
 class StrictHost {

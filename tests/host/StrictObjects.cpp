@@ -270,7 +270,7 @@ CMPIStatus returnInstance(const CMPIResult* result, const CMPIInstance* instance
         violations().add("returnInstance answers a request that is not for instances");
     }
     checkDelivered(*object->repository, delivered->model);
-    object->instances.push_back(delivered->model);
+    object->instances.push_back(withDefaults(*object->repository, delivered->model));
     return {CMPI_RC_OK, nullptr};
 }
 

@@ -170,4 +170,16 @@ void checkDelivered(const cimom::ClassRepository& repository, const cimom::Insta
     }
 }
 
+cimom::Instance withDefaults(const cimom::ClassRepository& repository, cimom::Instance instance) {
+    const cimom::ClassDeclaration* declaration = repository.find(instance.path.className);
+    if (declaration != nullptr) {
+        for (const cimom::PropertyDeclaration& property : declaration->properties) {
+            if (!property.defaultValue.isNull() && instance.property(property.name) == nullptr) {
+                instance.properties.push_back({property.name, property.defaultValue});
+            }
+        }
+    }
+    return instance;
+}
+
 }  // namespace strict

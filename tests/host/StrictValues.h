@@ -33,4 +33,7 @@ void checkType(const cimom::ClassRepository& repository, const std::string& clas
 void checkDelivered(const cimom::ClassRepository& repository, const cimom::ObjectPath& path);
 void checkDelivered(const cimom::ClassRepository& repository, const cimom::Instance& instance);
 
+/// The instance as a client sees it: an unset property shows its declared default.
+cimom::Instance withDefaults(const cimom::ClassRepository& repository, cimom::Instance instance);
+
 }  // namespace strict
