@@ -167,33 +167,31 @@ class Reader {
             app_.add_option(name, value, text)->type_name("FILE")->group(serversGroup);
         };
         app_.add_option("--connect", options.connect,
-                        "A WBEM server to ask, such as https://host.example; several may be given")
+                        "A WBEM server to ask, https://HOST; may be repeated")
             ->type_name("URL")
             ->expected(1)
             ->multi_option_policy(CLI::MultiOptionPolicy::TakeAll)
             ->group(serversGroup);
-        file("--hosts", options.hosts,
-             "WBEM servers to ask: a URL or host per line; - is standard input");
+        file("--hosts", options.hosts, "WBEM servers to ask, one per line; -: standard input");
         app_.add_option("--parallel", options.parallel,
                         "How many servers are asked at the same time (16)")
             ->type_name("N")
-            ->check(CLI::Range(1, mostParallel))
+            ->check(CLI::Range(1, mostParallel).description(""))
             ->group(serversGroup);
         app_.add_option_function<unsigned>(
                 "--timeout",
                 [&options](const unsigned& given) {
                     options.timeout = std::chrono::seconds(given);
                 },
-                "For all that is asked of a server, connecting included (30)")
+                "For all that is asked of one server (30)")
             ->type_name("SECONDS")
-            ->check(CLI::Range(1, longestTimeout))
+            ->check(CLI::Range(1, longestTimeout).description(""))
             ->group(serversGroup);
         file("--credentials", options.credentials,
-             "Users and passwords: lines \"machine HOST login USER password SECRET\"");
-        file("--cacert", options.caCertificate,
-             "The certificates (PEM) that vouch for servers, in place of the system's");
+             "Lines: machine HOST login USER password SECRET");
+        file("--cacert", options.caCertificate, "Who vouches for servers (PEM), not the system's");
         app_.add_flag("--insecure", options.insecure,
-                      "Ask servers that nobody vouches for, and send passwords unencrypted")
+                      "Trust any server, and send passwords over http")
             ->group(serversGroup);
     }
 
@@ -201,8 +199,7 @@ class Reader {
         Options& options = line_.options;
         app_.add_flag("--no-header", options.noHeader, "Tables without their headings")
             ->group(outputGroup);
-        app_.add_option("--sort", options.sort,
-                        "Sort by a column of the table, by PATH, or by a property of instances")
+        app_.add_option("--sort", options.sort, "Sort by a column, by PATH or by a property")
             ->type_name("COLUMN")
             ->group(outputGroup);
         app_.add_flag("--count", options.count, "How many there are, and nothing else")

@@ -85,29 +85,28 @@ OperationRequest aboutAssociations(const char* method, const cimom::ObjectPath& 
     return request;
 }
 
-/// The path of an instance that came without one: GetInstance does not repeat it. With
-/// all keys of the class, in its order, also when fewer were asked for.
+/// The path of an instance that came without one, since GetInstance does not repeat
+/// it: what was asked for. When that lacks keys, those of the class, in the instance's
+/// order.
 cimom::ObjectPath wholePath(const cimom::Instance& instance, const cimom::ObjectPath& asked,
                             const cimom::ClassDeclaration* declaration) {
     cimom::ObjectPath path = asked;
     path.className = instance.path.className;
-    if (declaration == nullptr) {
+    const auto isMissing = [&](const cimom::PropertyDeclaration& property) {
+        return property.isKey() && path.key(property.name) == nullptr;
+    };
+    if (declaration == nullptr ||
+        std::none_of(declaration->properties.begin(), declaration->properties.end(), isMissing)) {
         return path;
     }
     std::vector<cimom::NamedValue> keys;
-    for (const cimom::PropertyDeclaration& property : declaration->properties) {
-        if (!property.isKey()) {
-            continue;
+    for (const cimom::NamedValue& property : instance.properties) {
+        const cimom::PropertyDeclaration* const declared = declaration->property(property.name);
+        if (declared != nullptr && declared->isKey() && !property.value.isNull()) {
+            keys.push_back(property);
         }
-        const cimom::Value* const value = instance.property(property.name);
-        if (value == nullptr || value->isNull()) {
-            return path;
-        }
-        keys.push_back({property.name, *value});
     }
-    if (!keys.empty()) {
-        path.keys = std::move(keys);
-    }
+    path.keys = std::move(keys);
     return path;
 }
 
