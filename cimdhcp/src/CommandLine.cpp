@@ -46,6 +46,7 @@ Exit status:
   3  the provider or a file cannot be loaded, a server not be reached or
      understood, or the output not be written
   4  some of several servers have failed
+  130  interrupted while servers were asked
 
 Schema, registrations and providers are those that are installed with the program,
 unless an advanced option or one of the environment variables CIMDHCP_SCHEMA_DIR,

@@ -5,6 +5,7 @@
 #include <deque>
 #include <exception>
 #include <mutex>
+#include <system_error>
 #include <thread>
 #include <utility>
 
@@ -84,7 +85,14 @@ void askFleet(const std::vector<ServerUrl>& servers, std::size_t parallel, const
     // The threads end before anything that they use: jthread joins.
     std::vector<std::jthread> threads;
     for (std::size_t asker = 0; asker < askers; ++asker) {
-        threads.emplace_back(work);
+        try {
+            threads.emplace_back(work);
+        } catch (const std::system_error&) {
+            if (threads.empty()) {
+                throw;
+            }
+            reports.endAsker();  // the system has no more threads: fewer do the work
+        }
     }
     while (auto report = reports.take()) {
         arrived(*std::move(report));

@@ -51,7 +51,7 @@ const std::vector<Column<InterfaceOverview>>& overviewColumns() {
 std::string overviewTable(const std::vector<InterfaceOverview>& interfaces,
                           std::optional<std::size_t> width, const Style& style) {
     if (interfaces.empty()) {
-        return "This machine has no network interfaces.\n";
+        return style.header ? "This machine has no network interfaces.\n" : "";
     }
     const bool oneSystem =
         std::all_of(interfaces.begin(), interfaces.end(),

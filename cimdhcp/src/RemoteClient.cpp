@@ -112,7 +112,7 @@ cimom::ObjectPath wholePath(const cimom::Instance& instance, const cimom::Object
 
 /// The classes that no other one derives from and that are not the standard's own. A
 /// class below an association is one, too.
-std::vector<ClassEntry> leavesOf(std::vector<ClassEntry> classes) {
+std::vector<ClassEntry> leavesOf(const std::vector<ClassEntry>& classes) {
     constexpr int deepest = 64;  // a hierarchy that goes round in circles has no end
     std::unordered_map<std::string_view, const ClassEntry*> byName;
     std::unordered_set<std::string_view> parents;
@@ -304,7 +304,7 @@ std::vector<ClassEntry> RemoteClient::servedClasses() {
     if (!answer.status.ok()) {
         throw failure(answer, classPath(""));
     }
-    return leavesOf(std::move(classes));
+    return leavesOf(classes);
 }
 
 bool RemoteClient::mayServe(std::string_view /*className*/) const {

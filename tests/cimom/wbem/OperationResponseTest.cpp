@@ -3,8 +3,11 @@
 #include <gtest/gtest.h>
 
 #include <memory>
+#include <random>
 
+#include "RandomObjects.h"
 #include "wbem/Call.h"
+#include "wbem/ClassReader.h"
 #include "wbem/Errors.h"
 #include "wbem/ObjectWriter.h"
 
@@ -152,6 +155,77 @@ TEST(ReturnedInstance, HasNoMorePropertiesThanCanBeCompared) {
     }
     EXPECT_THROW(static_cast<void>(readReturnedInstance(element(xml + "</INSTANCE>"), "root")),
                  NotValid);
+}
+
+/// Reads an answer to the end, whatever it holds; whether it could be read.
+bool isReadable(const std::string& body, const std::string& method) {
+    try {
+        for (const XmlElement& one : readResponse(body, method, 64).returned) {
+            if (method == "GetClass") {
+                static_cast<void>(readClass(one));
+            } else if (method == "AssociatorNames") {
+                static_cast<void>(readReturnedPath(one, "root"));
+            } else {
+                static_cast<void>(readReturnedInstance(one, "root"));
+            }
+        }
+        return true;
+    } catch (const XmlError&) {
+    } catch (const NotValid&) {
+    } catch (const CimError&) {
+    }
+    return false;
+}
+
+TEST(OperationResponse, NoDamageDoesMoreThanMakeItUnreadable) {
+    ClassRepository repository;
+    repository.loadDirectory(ZR_SOURCE_DIR "/schema");
+    std::mt19937_64 random(test::randomSeed());
+    test::RandomObjects objects(random());
+    const auto below = [&random](std::size_t limit) { return random() % limit; };
+    int readable = 0;
+    constexpr int rounds = 4000;
+    for (int round = 0; round < rounds; ++round) {
+        std::string content = "<IRETURNVALUE>";
+        std::string method = "Associators";
+        if (round % 3 == 0) {
+            method = "GetClass";
+            const auto classes = repository.classes();
+            writeClass(content, *classes[below(classes.size())], {});
+        } else if (round % 3 == 1) {
+            method = "AssociatorNames";
+            content += "<OBJECTPATH>";
+            ObjectPath path = objects.path();
+            path.nameSpace = "root";
+            writeInstancePath(content, path, "host");
+            content += "</OBJECTPATH>";
+        } else {
+            writeInstance(content, objects.instance(), nullptr);
+        }
+        std::string body = answer(content + "</IRETURNVALUE>", method);
+        ASSERT_TRUE(isReadable(body, method)) << body;
+        for (std::size_t damage = 1 + below(3); damage > 0; --damage) {
+            const std::size_t place = below(body.size());
+            const std::size_t length = below(40);
+            switch (below(4)) {
+                case 0:
+                    body.erase(place, length);
+                    break;
+                case 1:
+                    body.insert(place, body.substr(below(body.size()), length));
+                    break;
+                case 2:
+                    body.resize(place + 1);
+                    break;
+                default:
+                    body[place] = static_cast<char>(below(256));
+            }
+        }
+        readable += isReadable(body, method) ? 1 : 0;
+    }
+    // Some damage hits a value's text alone, most does not.
+    EXPECT_GT(readable, 0);
+    EXPECT_LT(readable, rounds / 2);
 }
 
 }  // namespace cimom::wbem
