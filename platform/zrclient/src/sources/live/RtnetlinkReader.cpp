@@ -48,6 +48,7 @@ RtnetlinkReader::RtnetlinkReader(std::unique_ptr<NetlinkTransport> transport)
 
 NetworkState RtnetlinkReader::read(Deadline deadline) {
     NetworkState state;
+    held_ = {};
     if (dump(RTM_GETLINK, "links", parseLink, state.links, state, deadline)) {
         // Without links there is nothing that an address could belong to.
         dump(RTM_GETADDR, "addresses", parseAddress, state.addresses, state, deadline);
@@ -61,10 +62,7 @@ bool RtnetlinkReader::dump(std::uint16_t request, const char* what, Parse parse,
     using End = Outcome::End;
     Outcome outcome;
     for (int attempt = 0; attempt < attempts; ++attempt) {
-        // The kernel holds up whoever asks for links while others change some, and this
-        // wait of its own knows no deadline: nobody waits for it twice.
-        if (std::chrono::steady_clock::now() >= deadline) {
-            outcome.reason = attempt == 0 ? "no time left to ask for them" : outcome.reason;
+        if (attempt > 0 && std::chrono::steady_clock::now() >= deadline) {
             break;
         }
         facts.clear();
@@ -104,7 +102,7 @@ RtnetlinkReader::Outcome RtnetlinkReader::dumpOnce(std::uint16_t request, Parse 
     // refuses another dump while one is going on: such a socket is not used again.
     open_ = false;
     for (;;) {
-        const Datagram datagram = transport_->receive(buffer_, deadline);
+        const Datagram datagram = transport_->receive(buffer_, deadline + held_);
         if (datagram.error == ENOBUFS) {
             outcome.end = End::Lost;
             outcome.reason = "parts of the answer were lost";
@@ -129,7 +127,7 @@ RtnetlinkReader::Outcome RtnetlinkReader::dumpOnce(std::uint16_t request, Parse 
             open_ = outcome.end == End::Complete || outcome.end == End::Interrupted;
             return outcome;
         }
-        if (std::chrono::steady_clock::now() >= deadline) {
+        if (std::chrono::steady_clock::now() >= deadline + held_) {
             outcome.reason = "no complete answer in time";
             return outcome;
         }
@@ -212,7 +210,9 @@ int RtnetlinkReader::ask(std::uint16_t request) {
     } else {
         ::mnl_nlmsg_put_extra_header(message, sizeof(ifaddrmsg));
     }
+    const auto asking = std::chrono::steady_clock::now();
     const int error = transport_->send(std::span{space}.first(message->nlmsg_len));
+    held_ += std::chrono::steady_clock::now() - asking;
     open_ = error == 0;
     return error;
 }
