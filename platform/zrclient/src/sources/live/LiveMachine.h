@@ -53,6 +53,7 @@ class LiveMachine final : public SnapshotSource {
     [[nodiscard]] std::shared_ptr<const Snapshot> read() override;
 
   private:
+    [[nodiscard]] std::shared_ptr<const Snapshot> tryToRead();
     [[nodiscard]] ClientFacts readClients();
     void consultNetworkd(ClientFacts& clients);
     void watchProcesses(const ClientFacts& clients);
@@ -64,7 +65,8 @@ class LiveMachine final : public SnapshotSource {
     IpmiReader processor_;
     std::vector<WatchedPlace> places_;
     std::chrono::steady_clock::time_point networkdRest_;  // not to be asked before
-    std::unordered_set<std::string> reported_;
+    std::unordered_set<std::string> reported_;            // of the last reading
+    std::chrono::steady_clock::time_point troubleRest_;   // what is in it waits until then
 };
 
 }  // namespace ZR::Live
