@@ -283,7 +283,10 @@ class Reader {
         number("--max-connections", limits.connections, "Open connections (512)");
         number("--max-waiting", limits.waiting, "Requests that wait for a worker (256)");
         number("--max-enumerations", limits.sessions.sessions, "Open enumerations (64)");
+        number("--max-result", limits.result, "Bytes of a result (1073741824)");
         number("--workers", limits.workers, "Operations at the same time (4)");
+        number("--max-stuck", limits.stuck,
+               "Further workers, for those whose operation does not return (16)");
         number("--io-threads", limits.ioThreads, "Threads that read and send (2)");
         seconds("--request-timeout", limits.request,
                 "For a request to arrive, and again for its operation (30)");
