@@ -27,6 +27,13 @@ std::string reasonOf(int error) {
     return std::generic_category().message(error);
 }
 
+/// Whether a whole message lies at the start of so many bytes. libmnl's own check takes
+/// a length from 2 GiB on for a negative one, and so for a short one.
+bool isWhole(const nlmsghdr* message, int left) noexcept {
+    return left >= static_cast<int>(sizeof *message) && message->nlmsg_len >= sizeof *message &&
+           message->nlmsg_len <= static_cast<std::uint32_t>(left);
+}
+
 }  // namespace
 
 /// How one dump ended.
@@ -138,7 +145,7 @@ bool RtnetlinkReader::take(std::size_t size, std::uint16_t request, Parse parse,
     int left = static_cast<int>(size);
     // The buffer comes from operator new and is aligned for any structure.
     const auto* message = static_cast<const nlmsghdr*>(static_cast<const void*>(buffer_.data()));
-    for (; ::mnl_nlmsg_ok(message, left); message = ::mnl_nlmsg_next(message, &left)) {
+    for (; isWhole(message, left); message = ::mnl_nlmsg_next(message, &left)) {
         if (message->nlmsg_seq != sequence_) {
             continue;  // the rest of an answer that was given up
         }
