@@ -1,6 +1,7 @@
 #include "cimdhcp/CommandLine.h"
 
 #include <CLI/CLI.hpp>
+#include <algorithm>
 #include <map>
 #include <memory>
 #include <stdexcept>
@@ -62,6 +63,38 @@ constexpr const char* serverGroup = "The WBEM server";
 constexpr const char* limitGroup = "Limits of what a client may cost; none can be switched off";
 constexpr const char* advancedGroup = "Advanced options";
 
+/// Whether an option of the program or of any command takes a value.
+bool takesValue(const CLI::App& app, const std::string& option) {
+    const CLI::Option* const found = app.get_option_no_throw(option);
+    if (found != nullptr && found->get_items_expected_max() > 0) {
+        return true;
+    }
+    const auto commands = app.get_subcommands([](const CLI::App*) { return true; });
+    return std::any_of(commands.begin(), commands.end(),
+                       [&](const CLI::App* command) { return takesValue(*command, option); });
+}
+
+/// "--option=" as an option and an empty value, which the parser would look for in the
+/// next argument.
+std::vector<std::string> withEmptyValues(const CLI::App& app,
+                                         const std::vector<std::string>& arguments) {
+    std::vector<std::string> result;
+    bool operandsOnly = false;
+    for (const std::string& argument : arguments) {
+        operandsOnly = operandsOnly || argument == "--";
+        const bool noValue =
+            argument.starts_with("--") && argument.find('=') + 1 == argument.size();
+        const std::string option = argument.substr(0, argument.find('='));
+        if (!operandsOnly && noValue && takesValue(app, option)) {
+            result.push_back(option);
+            result.emplace_back();
+        } else {
+            result.push_back(argument);
+        }
+    }
+    return result;
+}
+
 /// The options of a command line while they are being read.
 class Reader {
   public:
@@ -85,7 +118,8 @@ class Reader {
     std::variant<CommandLine, Information> read(const std::vector<std::string>& arguments) {
         try {
             // The parser takes them from the end.
-            app_.parse(std::vector<std::string>(arguments.rbegin(), arguments.rend()));
+            const std::vector<std::string> whole = withEmptyValues(app_, arguments);
+            app_.parse(std::vector<std::string>(whole.rbegin(), whole.rend()));
         } catch (const CLI::CallForHelp&) {
             return Information{app_.help()};
         } catch (const CLI::CallForVersion& version) {

@@ -104,6 +104,13 @@ TEST_F(CommandLineText, TakesArgumentsThatLookLikeCommandsOrOptions) {
               Command(RenameCommand{"eth0", "\"quoted\" 'name'", false}));
 }
 
+TEST_F(CommandLineText, AnEmptyValueBehindAnEqualsSignIsNotTheNextArgument) {
+    EXPECT_EQ(refusal({"--tree=", "show"}), "--tree needs a name");
+    EXPECT_EQ(line({"--provider-dir=", "show"}).options.providerDir, "");
+    EXPECT_EQ(std::get<AssociatorsCommand>(line({"associators", "--role=", "P"}).command).role, "");
+    EXPECT_EQ(std::get<GetCommand>(line({"get", "--", "--tree="}).command).path, "--tree=");
+}
+
 TEST_F(CommandLineText, ReadsTheCommandsOfTheServer) {
     EXPECT_EQ(line({"serve"}).command, Command(ServeCommand()));
     ServeCommand serve;
