@@ -27,9 +27,9 @@ write_in_client() {
     in_client sh -c 'mkdir -p "$(dirname "$1")" && cat >"$1"' sh "$1"
 }
 
-# Each client has: start_client, stop_client (with a release), renew_client (unless it
-# can only wait until half of the time is over), and what it says itself: said_address and said_server, of the interface $1. A client that cannot follow a new
-# name says what it said before.
+# Each client has: start_client, stop_client (with a release), renew_client, and what it
+# says itself: said_address and said_server, of the interface $1. A client that cannot
+# follow a new name says what it said before.
 case $kind in
     dhclient)
         need dhclient
@@ -288,14 +288,12 @@ ip -n "$client" link set cable up
 eventually leased || { explain; fail "$kind gets no lease again"; }
 step "with the cable in again"
 
-if declare -F renew_client >/dev/null; then
-    before=$(lease_end)
-    sleep 1  # ends are told in seconds
-    renew_client || { explain; fail "$kind does not renew its lease"; }
-    renewed() { [[ $(lease_end) -gt $before ]] && leased; }
-    eventually renewed || { explain; fail "$kind has not renewed its lease"; }
-    step "renewed"
-fi
+before=$(lease_end)
+sleep 1  # ends are told in seconds
+renew_client || { explain; fail "$kind does not renew its lease"; }
+renewed() { [[ $(lease_end) -gt $before ]] && leased; }
+eventually renewed || { explain; fail "$kind has not renewed its lease"; }
+step "renewed"
 
 stop_client eth1 || fail "$kind does not give the first lease back"
 eventually no_address eth1 || { explain; fail "$kind keeps the first address"; }

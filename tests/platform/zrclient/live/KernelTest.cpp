@@ -1,7 +1,9 @@
 // The live machine against a real kernel, in a network namespace of its own.
 
+#include <arpa/inet.h>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <sys/socket.h>
 
 #include <atomic>
 #include <chrono>
@@ -11,6 +13,7 @@
 #include "Namespaces.h"
 #include "Support.h"
 #include "zrclient/LiveSource.h"
+#include "zrcommon/UniqueFd.h"
 
 namespace ZR::Live {
 namespace {
@@ -138,6 +141,46 @@ TEST(Kernel, PortsOfABridgeHaveNoDhcpOfTheirOwn) {
         EXPECT_EQ(valueOf(machine.now(), "mac0", Properties::AddressSource), number(0));
         EXPECT_EQ(valueOf(machine.now(), "mac0", Properties::IPv4Address),
                   PropertyValue{"192.0.2.5"});
+    }));
+}
+
+// Its process is not among those that are seen; the sockets are the kernel's.
+TEST(Kernel, TheSocketOfAHiddenClientShowsUntilItIsClosed) {
+    ZR_NEEDS_NAMESPACES();
+    EXPECT_TRUE(passesInNamespaces(30, [] {
+        // A link that is up has states that the kernel computes by and by. This one is not,
+        // so that nothing but the socket changes.
+        run("ip link add br0 type bridge && ip addr add 192.0.2.5/24 dev br0 && "
+            "ip link set lo up && echo 1 > /proc/sys/net/ipv4/ip_nonlocal_bind");
+        const TemporaryDirectory root;
+        std::filesystem::create_directories(root.path("/proc"));
+        std::filesystem::create_symlink("/proc/thread-self", root.path("/proc/thread-self"));
+        Surroundings surroundings;
+        surroundings.roots = {.files = root.path(), .proc = root.path("/proc")};
+        surroundings.realProcesses = false;
+        LiveMachine machine{std::move(surroundings)};
+
+        UniqueFd client{::socket(AF_INET, SOCK_DGRAM | SOCK_CLOEXEC, 0)};
+        const auto join = [&](auto call, const char* text, std::uint16_t port) {
+            sockaddr_in address{};
+            address.sin_family = AF_INET;
+            address.sin_port = htons(port);
+            ASSERT_EQ(::inet_pton(AF_INET, text, &address.sin_addr), 1);
+            const auto* const generic =
+                static_cast<const sockaddr*>(static_cast<const void*>(&address));
+            ASSERT_EQ(call(client.get(), generic, sizeof address), 0) << text;
+        };
+        join(::bind, "192.0.2.5", 68);
+        join(::connect, "127.0.0.1", 67);
+        const auto tree = machine.read();
+        EXPECT_EQ(valueOf(*tree, "br0", Properties::DHCPEnabled), PropertyValue{true});
+        EXPECT_EQ(valueOf(*tree, "br0", Properties::DHCPServerAddresses),
+                  PropertyValue{std::vector<std::string>{"127.0.0.1"}});
+        EXPECT_FALSE(machine.changed());
+        client.reset();
+        EXPECT_TRUE(machine.changed());
+        EXPECT_EQ(valueOf(*machine.read(), "br0", Properties::DHCPEnabled), PropertyValue{false});
+        EXPECT_FALSE(machine.changed());
     }));
 }
 
