@@ -188,10 +188,10 @@ TEST_F(ProvidersInAStrictHostTest, AnswerManyThreadsAtOnce) {
     constexpr std::size_t threadCount = 8;
     for (std::size_t number = 0; number < threadCount; ++number) {
         threads.emplace_back([&, number] {
-            for (std::size_t i = 0; i < expected_.size(); ++i) {
-                const std::size_t at =
-                    (i + number * expected_.size() / threadCount) % expected_.size();
-                if (strict::ask(host, expected_[at].request) != expected_[at].answer) {
+            // Each asks a third of all, and all ask different things at a time.
+            for (std::size_t at = number % 3; at < expected_.size(); at += 3) {
+                const Expectation& one = expected_[at];
+                if (strict::ask(host, one.request) != one.answer) {
                     ++wrong;
                 }
             }
