@@ -16,8 +16,10 @@ for file in "${tree[@]}"; do
     names[${file##*/}]=1
     tops[${file%%/*}]=1
 done
-in_tree() { # a path of the tree, with wildcards
-    compgen -G "$1" >/dev/null || compgen -G "$1.in" >/dev/null
+in_tree() { # a path of the tree, with wildcards; words such as TARGET stand for any
+    local path
+    path=$(sed -E 's/TARGET|NAME|WHY/*/g' <<<"$1")
+    compgen -G "$path" >/dev/null || compgen -G "$path.in" >/dev/null
 }
 
 pages=(README.md SECURITY.md CHANGELOG.md docs/*.md)

@@ -121,7 +121,9 @@ CMPIStatus addKey(const CMPIObjectPath* path, const char* name, const CMPIValue*
     if (object == nullptr || !given(name, "addKey", "name") || !given(value, "addKey", "value")) {
         return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
     }
-    checkType(*object->repository, object->model.className, name, type, "addKey");
+    if (!hasType(*object->repository, object->model.className, name, type, "addKey")) {
+        return {CMPI_RC_ERR_TYPE_MISMATCH, nullptr};
+    }
     put(object->model.keys, name, valueFrom(*value, type, "addKey"));
     return {CMPI_RC_OK, nullptr};
 }
@@ -133,7 +135,8 @@ CMPIData getKey(const CMPIObjectPath* path, const char* name, CMPIStatus* status
         return missing();
     }
     const cimom::Value* value = object->model.key(name);
-    answer(status, value == nullptr ? CMPI_RC_ERR_NO_SUCH_PROPERTY : CMPI_RC_OK);
+    // So says SFCB of a missing key, and other object managers something else.
+    answer(status, value == nullptr ? CMPI_RC_ERR_NOT_FOUND : CMPI_RC_OK);
     return value == nullptr ? missing() : dataFrom(*object->repository, *value, CMPI_keyValue);
 }
 
@@ -185,7 +188,9 @@ CMPIStatus setProperty(const CMPIInstance* instance, const char* name, const CMP
         !given(value, "setProperty", "value")) {
         return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
     }
-    checkType(*object->repository, object->model.path.className, name, type, "setProperty");
+    if (!hasType(*object->repository, object->model.path.className, name, type, "setProperty")) {
+        return {CMPI_RC_ERR_TYPE_MISMATCH, nullptr};
+    }
     put(object->model.properties, name, valueFrom(*value, type, "setProperty"));
     return {CMPI_RC_OK, nullptr};
 }

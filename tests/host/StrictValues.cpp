@@ -113,20 +113,22 @@ void put(std::vector<cimom::NamedValue>& values, const std::string& name, cimom:
     }
 }
 
-void checkType(const cimom::ClassRepository& repository, const std::string& className,
-               const std::string& property, CMPIType type, const char* function) {
+bool hasType(const cimom::ClassRepository& repository, const std::string& className,
+             const std::string& property, CMPIType type, const char* function) {
     const cimom::ClassDeclaration* declaration = repository.find(className);
-    if (declaration == nullptr) {
-        violations().add(std::string(function) + " of the unknown class " + className);
-        return;
-    }
-    const cimom::PropertyDeclaration* declared = declaration->property(property);
+    const cimom::PropertyDeclaration* declared =
+        declaration == nullptr ? nullptr : declaration->property(property);
     if (declared == nullptr) {
-        violations().add(std::string(function) + ": " + className + " has no " + property);
-    } else if (cmpiType(declared->type, declared->isArray) != type) {
+        violations().add(std::string(function) + ": no class declares " + className + "." +
+                         property);
+        return false;
+    }
+    if (cmpiType(declared->type, declared->isArray) != type) {
         violations().add(std::string(function) + ": " + className + "." + property +
                          " has another type");
+        return false;
     }
+    return true;
 }
 
 void checkDelivered(const cimom::ClassRepository& repository, const cimom::ObjectPath& path) {

@@ -24,9 +24,9 @@ CMPIData missing();
 /// Adds a named value, or replaces it.
 void put(std::vector<cimom::NamedValue>& values, const std::string& name, cimom::Value value);
 
-/// A property that its class declares must have the type that it declares.
-void checkType(const cimom::ClassRepository& repository, const std::string& className,
-               const std::string& property, CMPIType type, const char* function);
+/// Whether the class declares such a property, of this type.
+bool hasType(const cimom::ClassRepository& repository, const std::string& className,
+             const std::string& property, CMPIType type, const char* function);
 
 /// A path must have all keys of its class, none of them null, and no others; an
 /// instance its references as well. Object managers answer nothing at all otherwise.
