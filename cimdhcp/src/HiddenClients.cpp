@@ -56,7 +56,7 @@ HiddenClients findHiddenClients(const fs::path& proc) {
         std::getline(file, name);
         if (std::find(clients.begin(), clients.end(), name) != clients.end() &&
             !canTellNamespace(entry->path())) {
-            hidden.processes.push_back(name + " (process " + number + ")");
+            hidden.processes.push_back(name.append(" (process ").append(number).append(")"));
         }
     }
     return hidden;
