@@ -15,6 +15,7 @@
 #include "cimdhcp/DisplayText.h"
 #include "cimdhcp/EmbeddedClient.h"
 #include "cimdhcp/Failure.h"
+#include "cimdhcp/HiddenClients.h"
 #include "cimdhcp/JsonFormat.h"
 #include "cimdhcp/PlatformSetup.h"
 #include "zrclient/InstrumentationService.h"
@@ -166,6 +167,23 @@ class Examination {
                     std::string(directory) + " cannot be read whole by this user",
                     "run as root, or add the user to the group that may read it");
             }
+        }
+        lookAtClients();
+    }
+
+    /// Processes of DHCP clients that this user may not look into.
+    void lookAtClients() {
+        const HiddenClients hidden = findHiddenClients();
+        if (hidden.otherUsersHidden) {
+            add(Verdict::notable, "live source",
+                "/proc hides the processes of other users: DHCP clients among them are not seen",
+                "run as root, or add the user to the group that /proc is mounted for (gid=)");
+        }
+        for (const std::string& process : hidden.processes) {
+            add(Verdict::notable, "live source",
+                "the network of " + printable(process) +
+                    " is hidden from this user: what it does is not seen",
+                "run as root, or with CAP_SYS_PTRACE; for the service see docs/server.md");
         }
     }
 

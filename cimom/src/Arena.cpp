@@ -12,8 +12,9 @@ namespace {
 
 constexpr std::size_t largestChunk = std::size_t{1024} * 1024;
 constexpr std::size_t cloneChunk = 512;
+constexpr std::size_t fileChunk = std::size_t{512} * 1024;
 /// What stays in memory, whoever asks for it.
-constexpr std::size_t warm = std::size_t{4} * 1024 * 1024;
+constexpr std::size_t warm = std::size_t{1024} * 1024;
 
 }  // namespace
 
@@ -57,7 +58,7 @@ void* Arena::grow(std::size_t bytes) {
     void* memory = nullptr;
     std::size_t mapped = 0;
     if (reserved_ >= warm && !locked_) {
-        size = (size + largestChunk - 1) / largestChunk * largestChunk;
+        size = (bytes + header + fileChunk - 1) / fileChunk * fileChunk;
         memory = growInFile(size);
         mapped = memory == nullptr ? 0 : size;
     }
@@ -92,10 +93,13 @@ void* Arena::growInFile(std::size_t size) noexcept {
         return nullptr;
     }
     fileSize_ += size;
-    // The chunk before is full. Its pages come back from the file if anybody asks;
-    // that they are advised to go is no promise, and nothing depends on it.
-    if (chunks_ != nullptr && chunks_->mapped > 0) {
-        static_cast<void>(::madvise(chunks_, chunks_->mapped, MADV_DONTNEED));
+    // Pages that go come back from the file if anybody asks; that they are advised
+    // to go is no promise, and nothing depends on it. The last chunk but one goes:
+    // of an object in the last one, parts may still be missing, and touching one page
+    // brings its neighbours back as well.
+    Chunk* const full = chunks_ == nullptr ? nullptr : chunks_->previous;
+    if (full != nullptr && full->mapped > 0) {
+        static_cast<void>(::madvise(full, full->mapped, MADV_DONTNEED));
     }
     return memory;
 }

@@ -46,6 +46,8 @@ TemporaryFile::~TemporaryFile() {
     ::close(fd_);
 }
 
+// What is written belongs to the object, whatever the descriptor is.
+// NOLINTNEXTLINE(readability-make-member-function-const)
 void TemporaryFile::write(std::size_t position, const char* bytes, std::size_t size) {
     std::size_t written = 0;
     while (written < size) {
@@ -72,6 +74,7 @@ void TemporaryFile::read(std::size_t position, std::size_t size, std::string& ou
     }
 }
 
+// NOLINTNEXTLINE(readability-make-member-function-const): as above
 void* TemporaryFile::map(std::size_t position, std::size_t size) noexcept {
     // With room set aside now, no later write into the mapping can meet a full disk,
     // which would end the process.
