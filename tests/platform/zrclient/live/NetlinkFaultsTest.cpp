@@ -372,7 +372,8 @@ std::vector<std::span<std::byte>> attributesIn(std::span<std::byte> bytes) {
             attributes.push_back(message.subspan(at));
             nlattr attribute{};
             std::memcpy(&attribute, attributes.back().data(), sizeof attribute);
-            at += std::max<std::size_t>(NLA_ALIGN(attribute.nla_len), NLA_HDRLEN);
+            const std::size_t length = std::max(std::size_t{attribute.nla_len}, sizeof attribute);
+            at += (length + 3) & ~std::size_t{3};
         }
     }
     return attributes;
