@@ -372,8 +372,8 @@ std::vector<std::span<std::byte>> attributesIn(std::span<std::byte> bytes) {
             attributes.push_back(message.subspan(at));
             nlattr attribute{};
             std::memcpy(&attribute, attributes.back().data(), sizeof attribute);
-            const auto length = static_cast<std::size_t>(attribute.nla_len);
-            at += std::max<std::size_t>((length + 3) / 4 * 4, NLA_HDRLEN);
+            const std::size_t length = std::max(std::size_t{attribute.nla_len}, sizeof attribute);
+            at += (length + 3) & ~std::size_t{3};
         }
     }
     return attributes;

@@ -96,7 +96,7 @@ LiveMachine::LiveMachine(Surroundings surroundings)
 bool LiveMachine::changed() {
     // Being asked is what moves the talk with the service processor on.
     return processor_.changed() || monitor_.changed() || socketsChanged() ||
-           (!reported_.empty() && surroundings_.uptime() >= troubleRest_);
+           (troubled_ && surroundings_.uptime() >= troubleRest_);
 }
 
 /// Nothing tells when a socket is closed. Where it is all that was seen of a client, it is
@@ -145,12 +145,14 @@ std::shared_ptr<const Snapshot> LiveMachine::tryToRead() {
         sockets_->packetLinks = clients.packetLinks;
     }
     markWireless(surroundings_.roots, network.links);
-    std::optional<ServiceProcessor> processor = processor_.read(clients.complaints);
     std::string hostName = getSystemName();
     if (hostName.empty()) {
         clients.complaints.push_back("the system does not tell its name: " +
                                      std::generic_category().message(errno));
     }
+    planAnotherTry(clients.complaints);
+    // The service processor is asked again at its own pace.
+    std::optional<ServiceProcessor> processor = processor_.read(clients.complaints);
     removeRepeated(clients.complaints);
     report(clients.complaints);
     if (hostName.empty()) {
@@ -235,14 +237,21 @@ ClientFacts LiveMachine::readClients() {
     return facts;
 }
 
+/// What went wrong for the first time may be over at once.
+void LiveMachine::planAnotherTry(const std::vector<std::string>& complaints) {
+    const bool lasts =
+        std::all_of(complaints.begin(), complaints.end(),
+                    [&](const std::string& complaint) { return reported_.contains(complaint); });
+    troubled_ = !complaints.empty();
+    troubleRest_ = surroundings_.uptime();
+    if (lasts) {
+        troubleRest_ += troublePause;
+    }
+}
+
 /// Reports what the last reading did not complain about: a lasting trouble is one
 /// line, however often the machine is read.
 void LiveMachine::report(const std::vector<std::string>& complaints) {
-    troubleRest_ = surroundings_.uptime();
-    if (std::all_of(complaints.begin(), complaints.end(),
-                    [&](const std::string& complaint) { return reported_.contains(complaint); })) {
-        troubleRest_ += troublePause;
-    }
     for (const std::string& complaint : complaints) {
         if (!reported_.contains(complaint)) {
             surroundings_.complain(complaint);

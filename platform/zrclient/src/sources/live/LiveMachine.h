@@ -59,6 +59,7 @@ class LiveMachine final : public SnapshotSource {
     void consultNetworkd(ClientFacts& clients);
     void watchProcesses(const ClientFacts& clients);
     [[nodiscard]] bool socketsChanged() const;
+    void planAnotherTry(const std::vector<std::string>& complaints);
     void report(const std::vector<std::string>& complaints);
 
     Surroundings surroundings_;
@@ -69,7 +70,8 @@ class LiveMachine final : public SnapshotSource {
     std::optional<ClientFacts> sockets_;  // where nothing else tells of who has them
     std::chrono::steady_clock::time_point networkdRest_;  // not to be asked before
     std::unordered_set<std::string> reported_;            // of the last reading
-    std::chrono::steady_clock::time_point troubleRest_;   // what is in it waits until then
+    bool troubled_ = false;                               // something could not be read
+    std::chrono::steady_clock::time_point troubleRest_;   // it is not tried again before
 };
 
 }  // namespace ZR::Live
