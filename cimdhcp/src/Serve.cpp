@@ -107,7 +107,7 @@ Listening readListening(const std::string& text) {
     return listening;
 }
 
-void serve(const ServeCommand& command, Client& client, std::ostream& out) {
+void serve(const ServeCommand& command, EmbeddedClient& client, std::ostream& out) {
     const sigset_t signals = blockEndSignals();
     try {
         cimom::wbem::Server server(client.manager(), settingsOf(command), log);

@@ -134,6 +134,70 @@ TEST_F(CommandLineText, ReadsTheCommandsOfTheServer) {
     EXPECT_EQ(line({"check"}).command, Command(CheckCommand()));
 }
 
+TEST_F(CommandLineText, NamesServers) {
+    Options options;
+    options.connect = {"a", "https://b"};
+    options.hosts = "-";
+    options.parallel = 256;
+    options.timeout = std::chrono::seconds(5);
+    options.credentials = "c";
+    options.caCertificate = "ca";
+    options.insecure = true;
+    EXPECT_EQ(
+        line({"--connect", "a", "show", "--connect", "https://b", "--hosts", "-", "--parallel",
+              "256", "--timeout", "5", "--credentials", "c", "--cacert", "ca", "--insecure"}),
+        (CommandLine{options, ShowCommand{}}));
+    EXPECT_TRUE(options.remote());
+    EXPECT_FALSE(Options{}.remote());
+}
+
+TEST_F(CommandLineText, SaysHowTheAnswerIsShown) {
+    Options options;
+    options.noHeader = true;
+    options.sort = "STATE";
+    options.count = true;
+    options.time = true;
+    options.color = ColorMode::always;
+    EXPECT_EQ(
+        line({"show", "--no-header", "--sort", "STATE", "--count", "--time", "--color", "always"}),
+        (CommandLine{options, ShowCommand{}}));
+    EXPECT_EQ(line({"show", "--color=never"}).options.color, ColorMode::never);
+    EXPECT_EQ(line({"show", "--color=auto"}).options.color, ColorMode::automatic);
+}
+
+TEST_F(CommandLineText, RefusesWhatServersCannotBeAsked) {
+    for (const std::vector<std::string>& command : {std::vector<std::string>{"tree"},
+                                                    {"serve"},
+                                                    {"check"},
+                                                    {"user", "add", "--users", "f", "a"}}) {
+        std::vector<std::string> arguments{"--connect", "h"};
+        arguments.insert(arguments.end(), command.begin(), command.end());
+        EXPECT_EQ(refusal(arguments),
+                  "this command is about this machine alone; --connect and --hosts are not for it");
+    }
+    EXPECT_EQ(refusal({"--connect", "h", "rename", "--create", "eth0", "x"}),
+              "--create cannot make files on other machines");
+    EXPECT_EQ(refusal({"--hosts", "f", "--tree", "t", "show"}),
+              "--tree and --data-dir are about this machine; they cannot be given with --connect "
+              "or --hosts");
+    for (const char* option : {"--credentials=c", "--cacert=c", "--insecure"}) {
+        EXPECT_NE(refusal({option, "show"}), "accepted");
+    }
+    for (const char* option : {"--parallel=0", "--parallel=257", "--timeout=0", "--timeout=-1",
+                               "--timeout=x", "--timeout=86401", "--color=red"}) {
+        EXPECT_NE(refusal({"--connect", "h", option, "show"}), "accepted") << option;
+    }
+}
+
+TEST_F(CommandLineText, RefusesToSortAndCountWhatIsNoList) {
+    EXPECT_EQ(refusal({"graph", "--count"}),
+              "this command answers no list: there is nothing to count");
+    EXPECT_EQ(refusal({"rename", "a", "b", "--sort", "x"}),
+              "this command answers no list: there is nothing to sort");
+    EXPECT_NE(refusal({"get", "P", "--count"}), "accepted");
+    EXPECT_NE(refusal({"serve", "--count"}), "accepted");
+}
+
 TEST_F(CommandLineText, ATreeMayBeExplained) {
     EXPECT_EQ(line({"tree"}).command, Command(TreeCommand{false}));
     EXPECT_EQ(line({"tree", "--explain"}).command, Command(TreeCommand{true}));
@@ -149,7 +213,7 @@ TEST_F(CommandLineText, TellsWhatIsWrong) {
     EXPECT_EQ(refusal({"serve", "--max-body", "0"}), "--max-body is 0; it may be 1 to 1073741824");
     EXPECT_NE(refusal({"serve", "--request-timeout", "x"}), "accepted");
     EXPECT_EQ(refusal({"show", "eth0"}), "The following argument was not expected: eth0" + hint);
-    EXPECT_EQ(refusal({"--connect", "x", "show"}).substr(0, 37),
+    EXPECT_EQ(refusal({"--nothing", "x", "show"}).substr(0, 37),
               "The following arguments were not expe");
     EXPECT_EQ(refusal({"rename", "eth0"}), "NAME is required" + hint);
     EXPECT_EQ(refusal({"modify", "P"}), "PROPERTY=VALUE is required" + hint);
@@ -193,6 +257,18 @@ TEST_F(CommandLineText, HelpNamesEveryCommandAndOption) {
                              "--data-dir DIR",
                              "--namespace NS",
                              "--format FORMAT",
+                             "--connect URL",
+                             "--hosts FILE",
+                             "--parallel N",
+                             "--timeout SECONDS",
+                             "--credentials FILE",
+                             "--cacert FILE",
+                             "--insecure",
+                             "--no-header",
+                             "--sort COLUMN",
+                             "--count",
+                             "--time",
+                             "--color WHEN",
                              "--schema-dir DIR",
                              "--registration-dir DIR",
                              "--provider-dir DIR",

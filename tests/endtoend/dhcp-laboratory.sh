@@ -49,10 +49,11 @@ expect() {
     [[ $output == *"$text"* ]] || fail "$* lacks \"$text\": $output"
 }
 
-# eventually COMMAND...: the command succeeds within ten seconds.
+# eventually COMMAND...: the command succeeds within half a minute, which a busy machine
+# may need.
 eventually() {
     local attempt
-    for ((attempt = 0; attempt < 100; ++attempt)); do
+    for ((attempt = 0; attempt < 300; ++attempt)); do
         "$@" >/dev/null 2>&1 && return 0
         sleep 0.1
     done

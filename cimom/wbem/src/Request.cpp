@@ -1,30 +1,13 @@
 #include "Request.h"
 
 #include <algorithm>
-#include <memory>
 
 #include "wbem/ObjectWriter.h"
+#include "wbem/PathLocation.h"
 
 namespace cimom::wbem {
 
 namespace {
-
-using Reference = std::shared_ptr<const ObjectPath>;
-
-void locateKeys(std::vector<NamedValue>& keys, const std::string& nameSpace) {
-    for (NamedValue& key : keys) {
-        const Scalar* const scalar = key.value.scalar();
-        const auto* const reference = scalar == nullptr ? nullptr : std::get_if<Reference>(scalar);
-        if (reference != nullptr) {
-            ObjectPath path = **reference;
-            if (path.nameSpace.empty()) {
-                path.nameSpace = nameSpace;
-            }
-            locateKeys(path.keys, path.nameSpace);
-            key.value.content = Scalar(std::make_shared<const ObjectPath>(std::move(path)));
-        }
-    }
-}
 
 void nameBareKey(NamedValue& key, const ClassDeclaration* declaration) {
     const PropertyDeclaration* only = nullptr;
@@ -79,10 +62,7 @@ const ClassDeclaration& requireClass(const Request& request, const std::string& 
 }
 
 ObjectPath located(const Request& request, ObjectPath path) {
-    if (path.nameSpace.empty()) {
-        path.nameSpace = request.call.nameSpace;
-    }
-    locateKeys(path.keys, path.nameSpace);
+    locate(path, request.call.nameSpace);
     for (NamedValue& key : path.keys) {
         if (key.name.empty()) {
             nameBareKey(key, request.manager.repository().find(path.className));

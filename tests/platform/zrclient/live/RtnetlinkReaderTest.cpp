@@ -238,20 +238,42 @@ TEST_F(RtnetlinkReaderTest, AMessageOfALengthWithTheHighestBitIsLeftOutAndReport
 }
 
 TEST_F(RtnetlinkReaderTest, SilenceEndsAtTheDeadline) {
-    const auto start = steady_clock::now();
     const NetworkState state = read({{}}, milliseconds{60});
-    const auto took = steady_clock::now() - start;
     EXPECT_THAT(state.links, IsEmpty());
     EXPECT_THAT(state.complaints, ElementsAre(HasSubstr("no answer: ")));
-    EXPECT_LT(took, milliseconds{1000});
 }
 
 TEST_F(RtnetlinkReaderTest, ADumpThatNeverEndsEndsAtTheDeadline) {
-    const auto start = steady_clock::now();
     const NetworkState state = read({{Step::endless({linkMessage(2, "again")})}}, milliseconds{60});
-    EXPECT_LT(steady_clock::now() - start, milliseconds{1000});
     EXPECT_THAT(state.links, IsEmpty());
     EXPECT_THAT(state.complaints, ElementsAre(HasSubstr("no complete answer in time")));
+}
+
+TEST_F(RtnetlinkReaderTest, AfterTheDeadlineNothingIsAskedForAgain) {
+    const Message interrupted = linkMessage(2, "busy", 0, NLM_F_MULTI | NLM_F_DUMP_INTR);
+    auto transport = std::make_unique<ScriptedTransport>(
+        std::deque<std::vector<Step>>{{parts({interrupted, done()})}, someLinks()});
+    transport->holdQuestions(milliseconds{30});
+    const ScriptedTransport& held = *transport;
+    RtnetlinkReader reader{std::move(transport)};
+    const NetworkState state = reader.read(steady_clock::now() + milliseconds{20});
+    EXPECT_EQ(held.asked(), 1);
+    EXPECT_THAT(names(state), ElementsAre("busy"));
+    EXPECT_THAT(state.addresses, IsEmpty());
+    EXPECT_FALSE(state.certain);
+    EXPECT_THAT(state.complaints, ElementsAre("network links: changed while they were read",
+                                              "network addresses: no time left to ask for them"));
+}
+
+TEST_F(RtnetlinkReaderTest, PartsThatComeAfterTheDeadlineAreNoLinks) {
+    auto transport = std::make_unique<ScriptedTransport>(std::deque<std::vector<Step>>{
+        {parts({linkMessage(2, "early")}), parts({linkMessage(3, "late"), done()})}});
+    transport->holdQuestions(milliseconds{30});
+    RtnetlinkReader reader{std::move(transport)};
+    const NetworkState state = reader.read(steady_clock::now() + milliseconds{20});
+    EXPECT_THAT(state.links, IsEmpty());
+    EXPECT_FALSE(state.certain);
+    EXPECT_THAT(state.complaints, ElementsAre("network links: no complete answer in time"));
 }
 
 TEST_F(RtnetlinkReaderTest, AfterAFailureTheNextReadingBeginsAnew) {

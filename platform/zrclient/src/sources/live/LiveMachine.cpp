@@ -12,6 +12,7 @@
 #include "Clients.h"
 #include "Decide.h"
 #include "IpmiDevice.h"
+#include "Sockets.h"
 #include "tklogger/TKLogger.h"
 #include "zrclient/LiveSource.h"
 #include "zrcommon/SystemName.h"
@@ -88,7 +89,18 @@ LiveMachine::LiveMachine(Surroundings surroundings)
 
 bool LiveMachine::changed() {
     // Being asked is what moves the talk with the service processor on.
-    return processor_.changed() || monitor_.changed();
+    return processor_.changed() || monitor_.changed() || socketsChanged();
+}
+
+/// Nothing tells when a socket is closed. Where it is all that was seen of a client, it is
+/// looked at again with every question.
+bool LiveMachine::socketsChanged() const {
+    if (!sockets_) {
+        return false;
+    }
+    ClientFacts now;
+    readSockets(surroundings_.roots, now);
+    return now.sockets != sockets_->sockets || now.packetLinks != sockets_->packetLinks;
 }
 
 bool LiveMachine::awaiting() {
@@ -108,6 +120,12 @@ std::shared_ptr<const Snapshot> LiveMachine::read() {
     }
     if (surroundings_.realProcesses) {
         watchProcesses(clients);
+    }
+    sockets_.reset();
+    if (clients.socketsStandAlone()) {
+        sockets_.emplace();
+        sockets_->sockets = clients.sockets;
+        sockets_->packetLinks = clients.packetLinks;
     }
     markWireless(surroundings_.roots, network.links);
     std::optional<ServiceProcessor> processor = processor_.read(clients.complaints);

@@ -4,6 +4,7 @@
 #include <cstdint>
 #include <functional>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <unordered_set>
@@ -56,6 +57,7 @@ class LiveMachine final : public SnapshotSource {
     [[nodiscard]] ClientFacts readClients();
     void consultNetworkd(ClientFacts& clients);
     void watchProcesses(const ClientFacts& clients);
+    [[nodiscard]] bool socketsChanged() const;
     void report(const std::vector<std::string>& complaints);
 
     Surroundings surroundings_;
@@ -63,6 +65,7 @@ class LiveMachine final : public SnapshotSource {
     ChangeMonitor monitor_;
     IpmiReader processor_;
     std::vector<WatchedPlace> places_;
+    std::optional<ClientFacts> sockets_;  // where nothing else tells of who has them
     std::chrono::steady_clock::time_point networkdRest_;  // not to be asked before
     std::unordered_set<std::string> reported_;
 };

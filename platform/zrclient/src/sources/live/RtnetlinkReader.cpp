@@ -68,6 +68,12 @@ bool RtnetlinkReader::dump(std::uint16_t request, const char* what, Parse parse,
     using End = Outcome::End;
     Outcome outcome;
     for (int attempt = 0; attempt < attempts; ++attempt) {
+        // The kernel holds up whoever asks for links while others change some, and this
+        // wait of its own knows no deadline: nobody waits for it twice.
+        if (std::chrono::steady_clock::now() >= deadline) {
+            outcome.reason = attempt == 0 ? "no time left to ask for them" : outcome.reason;
+            break;
+        }
         facts.clear();
         outcome = dumpOnce(request, parse, facts, deadline);
         if (outcome.end == End::Complete || outcome.end == End::Failed) {

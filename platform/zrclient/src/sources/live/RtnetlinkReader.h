@@ -28,7 +28,10 @@ class RtnetlinkReader {
   public:
     explicit RtnetlinkReader(std::unique_ptr<NetlinkTransport> transport = kernelTransport());
 
-    /// Never throws apart from std::bad_alloc; returns at the deadline at the latest.
+    /// Never throws apart from std::bad_alloc. Waits for answers until the deadline at the
+    /// latest, and asks nothing after it. While somebody holds the kernel's lock of all
+    /// links, as a namespace of a thousand bridges does for seconds when it goes, the kernel
+    /// keeps whoever asks for links in the very call that asks: that no deadline ends.
     [[nodiscard]] NetworkState read(Deadline deadline);
 
   private:
