@@ -262,7 +262,7 @@ std::set<std::string, std::less<>> kernelThreads() {
         threads.emplace(word.data());
     }
     if (children != nullptr) {
-        std::fclose(children);
+        static_cast<void>(std::fclose(children));
     }
     return threads;
 }

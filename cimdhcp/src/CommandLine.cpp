@@ -6,10 +6,10 @@
 #include <memory>
 #include <stdexcept>
 
-#include "cimdhcp/ClientCommands.h"
 #include "cimdhcp/DisplayText.h"
 #include "cimdhcp/Failure.h"
 #include "cimdhcp/HelpFormatter.h"
+#include "cimdhcp/OptionGroups.h"
 
 namespace cimdhcp {
 
@@ -61,12 +61,7 @@ constexpr const char* classGroup = "Classes and instances";
 constexpr const char* associationGroup = "Associations";
 constexpr const char* serverGroup = "The WBEM server";
 constexpr const char* limitGroup = "Limits of what a client may cost; none can be switched off";
-constexpr const char* serversGroup = "Other machines";
-constexpr const char* outputGroup = "The output";
 constexpr const char* advancedGroup = "Advanced options";
-
-constexpr int mostParallel = 256;
-constexpr int longestTimeout = 86400;
 
 /// Whether an option of the program or of any command takes a value.
 bool takesValue(const CLI::App& app, const std::string& option) {
@@ -177,8 +172,8 @@ class Reader {
                            ? std::string()
                            : "there is no format \"" + name + "\", only table, mof and json";
             });
-        addServersOptions();
-        addOutputOptions();
+        addRemoteOptions(app_, line_.options);
+        addOutputOptions(app_, line_.options);
         app_.add_option("--schema-dir", line_.options.schemaDir, "Directory of the *.mof files")
             ->type_name("DIR")
             ->envname("CIMDHCP_SCHEMA_DIR")
@@ -193,67 +188,6 @@ class Reader {
             ->type_name("DIR")
             ->envname("CIMDHCP_PROVIDER_DIR")
             ->group(advancedGroup);
-    }
-
-    void addServersOptions() {
-        Options& options = line_.options;
-        const auto file = [this](const char* name, std::optional<std::string>& value,
-                                 const char* text) {
-            app_.add_option(name, value, text)->type_name("FILE")->group(serversGroup);
-        };
-        app_.add_option("--connect", options.connect,
-                        "A WBEM server to ask, https://HOST; may be repeated")
-            ->type_name("URL")
-            ->expected(1)
-            ->multi_option_policy(CLI::MultiOptionPolicy::TakeAll)
-            ->group(serversGroup);
-        file("--hosts", options.hosts, "WBEM servers to ask, one per line; -: standard input");
-        app_.add_option("--parallel", options.parallel,
-                        "How many servers are asked at the same time (16)")
-            ->type_name("N")
-            ->check(CLI::Range(1, mostParallel).description(""))
-            ->group(serversGroup);
-        app_.add_option_function<unsigned>(
-                "--timeout",
-                [&options](const unsigned& given) {
-                    options.timeout = std::chrono::seconds(given);
-                },
-                "For all that is asked of one server (30)")
-            ->type_name("SECONDS")
-            ->check(CLI::Range(1, longestTimeout).description(""))
-            ->group(serversGroup);
-        file("--credentials", options.credentials,
-             "Lines: machine HOST login USER password SECRET");
-        file("--cacert", options.caCertificate, "Who vouches for servers (PEM), not the system's");
-        app_.add_flag("--insecure", options.insecure,
-                      "Trust any server, and send passwords over http")
-            ->group(serversGroup);
-    }
-
-    void addOutputOptions() {
-        Options& options = line_.options;
-        app_.add_flag("--no-header", options.noHeader, "Tables without their headings")
-            ->group(outputGroup);
-        app_.add_option("--sort", options.sort, "Sort by a column, by PATH or by a property")
-            ->type_name("COLUMN")
-            ->group(outputGroup);
-        app_.add_flag("--count", options.count, "How many there are, and nothing else")
-            ->group(outputGroup);
-        app_.add_flag("--time", options.time, "Tell how long it took")->group(outputGroup);
-        const std::map<std::string, ColorMode> modes{{"auto", ColorMode::automatic},
-                                                     {"always", ColorMode::always},
-                                                     {"never", ColorMode::never}};
-        app_.add_option_function<std::string>(
-                "--color",
-                [&options, modes](const std::string& name) { options.color = modes.at(name); },
-                "auto (the default: on a terminal), always or never")
-            ->type_name("WHEN")
-            ->check([modes](const std::string& name) {
-                return modes.contains(name)
-                           ? std::string()
-                           : "--color is auto, always or never, not \"" + name + "\"";
-            })
-            ->group(outputGroup);
     }
 
     /// A command whose arguments are read into a record of its own.
@@ -383,7 +317,10 @@ class Reader {
         number("--max-connections", limits.connections, "Open connections (512)");
         number("--max-waiting", limits.waiting, "Requests that wait for a worker (256)");
         number("--max-enumerations", limits.sessions.sessions, "Open enumerations (64)");
+        number("--max-result", limits.result, "Bytes of a result (1073741824)");
         number("--workers", limits.workers, "Operations at the same time (4)");
+        number("--max-stuck", limits.stuck,
+               "Further workers, for those whose operation does not return (16)");
         number("--io-threads", limits.ioThreads, "Threads that read and send (2)");
         seconds("--request-timeout", limits.request,
                 "For a request to arrive, and again for its operation (30)");
@@ -430,41 +367,10 @@ class Reader {
                 throw Failure(ExitStatus::usage, std::string("--") + error.what());
             }
         }
-        checkServers();
-        if ((options.sort || options.count) && !answersList(line_.command)) {
-            throw Failure(ExitStatus::usage, "this command answers no list: there is nothing to " +
-                                                 std::string(options.sort ? "sort" : "count"));
-        }
+        checkOptionsFor(line_);
         if (options.format == Format::mof && !hasMofForm()) {
             throw Failure(ExitStatus::usage,
                           "this command has no MOF output; use --format table or json");
-        }
-    }
-
-    void checkServers() const {
-        const Options& options = line_.options;
-        if (!options.remote()) {
-            const bool given = options.credentials || options.caCertificate || options.insecure;
-            if (given) {
-                throw Failure(ExitStatus::usage,
-                              "--credentials, --cacert and --insecure are about servers; name "
-                              "one with --connect, or several with --hosts");
-            }
-            return;
-        }
-        if (!asksClient(line_.command)) {
-            throw Failure(ExitStatus::usage,
-                          "this command is about this machine alone; --connect and --hosts are "
-                          "not for it");
-        }
-        if (options.tree || options.dataDir) {
-            throw Failure(ExitStatus::usage,
-                          "--tree and --data-dir are about this machine; they cannot be given "
-                          "with --connect or --hosts");
-        }
-        const auto* const rename = std::get_if<RenameCommand>(&line_.command);
-        if (rename != nullptr && rename->create) {
-            throw Failure(ExitStatus::usage, "--create cannot make files on other machines");
         }
     }
 

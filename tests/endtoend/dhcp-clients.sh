@@ -90,16 +90,16 @@ HOOK
             eventually test -n "$(sleep 0.3; cat "$work/client.pid")"
         }
         stop_client() {
-            kill -USR2 "$(<"$work/client.pid")"
+            signal_client USR2 "$(<"$work/client.pid")"
             eventually no_address "$1"
-            kill "$(<"$work/client.pid")"
+            signal_client TERM "$(<"$work/client.pid")"
         }
         said() {
             in_client sed -n "s/^$1=//p" /run/udhcpc.eth1.state
         }
         said_address() { said ip; }
         said_server() { said serverid; }
-        renew_client() { kill -USR1 "$(<"$work/client.pid")"; }
+        renew_client() { signal_client USR1 "$(<"$work/client.pid")"; }
         renamed_back=yes
         ;;
     networkd)

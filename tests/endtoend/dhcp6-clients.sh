@@ -29,7 +29,7 @@ FILE
                 >"$work/client.log" 2>&1 &
             disown  # its end is no news
         }
-        stop_client() { kill "$(in_client cat /run/dhcp6c.pid)"; }
+        stop_client() { signal_client TERM "$(in_client cat /run/dhcp6c.pid)"; }
         ;;
     dhclient)
         start_client() {

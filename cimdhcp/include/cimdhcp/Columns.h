@@ -21,6 +21,7 @@ struct Column {
 template <typename Row>
 std::vector<std::string> headingsOf(const std::vector<Column<Row>>& columns) {
     std::vector<std::string> headings;
+    headings.reserve(columns.size());
     for (const Column<Row>& column : columns) {
         headings.push_back(column.heading);
     }
@@ -32,6 +33,7 @@ Table tableOf(const std::vector<Column<Row>>& columns, const std::vector<Row>& r
     Table table(headingsOf(columns));
     for (const Row& row : rows) {
         std::vector<std::string> cells;
+        cells.reserve(columns.size());
         for (const Column<Row>& column : columns) {
             cells.push_back(column.cell(row));
         }

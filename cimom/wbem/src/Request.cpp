@@ -27,18 +27,6 @@ void nameBareKey(NamedValue& key, const ClassDeclaration* declaration) {
     key.name = only->name;
 }
 
-template <typename Object>
-std::vector<Object> presentOf(std::vector<std::optional<Object>> objects) {
-    std::vector<Object> result;
-    result.reserve(objects.size());
-    for (auto& object : objects) {
-        if (object) {
-            result.push_back(*std::move(object));
-        }
-    }
-    return result;
-}
-
 }  // namespace
 
 void requireNameSpace(const Request& request) {
@@ -87,27 +75,60 @@ void requireOk(const Status& status) {
     }
 }
 
-std::vector<ObjectPath> present(std::vector<std::optional<ObjectPath>> paths) {
-    return presentOf(std::move(paths));
-}
-
-std::vector<Instance> present(std::vector<std::optional<Instance>> instances) {
-    return presentOf(std::move(instances));
-}
-
-void cutToClass(std::vector<Instance>& instances, const ClassDeclaration& declaration) {
-    for (Instance& instance : instances) {
-        std::erase_if(instance.properties, [&declaration](const NamedValue& property) {
-            return declaration.property(property.name) == nullptr;
+void cutToClass(Instance& instance, const ClassDeclaration* declaration) {
+    if (declaration != nullptr) {
+        std::erase_if(instance.properties, [declaration](const NamedValue& property) {
+            return declaration->property(property.name) == nullptr;
         });
     }
 }
+
+template <typename Object>
+void SpoolReceiver<Object>::take(std::optional<Object> object) {
+    if (caller_.gone && caller_.gone()) {
+        throw CimError(CimStatus::failed, "nobody waits for the result any more");
+    }
+    if (object) {
+        text_.clear();
+        write_(text_, *object);
+        result_.spool->append(text_);
+        ++result_.count;
+    }
+}
+
+template <typename Object>
+std::size_t SpoolReceiver<Object>::mark() {
+    marks_.push_back({result_.spool->size(), result_.count});
+    return marks_.size() - 1;
+}
+
+template <typename Object>
+void SpoolReceiver<Object>::backTo(std::size_t mark) {
+    result_.spool->cut(marks_[mark].size);
+    result_.count = marks_[mark].count;
+}
+
+template class SpoolReceiver<ObjectPath>;
+template class SpoolReceiver<Instance>;
 
 void writeInstanceOf(std::string& out, const Instance& instance,
                      const ClassRepository* originRepository) {
     writeInstance(
         out, instance,
         originRepository == nullptr ? nullptr : originRepository->find(instance.path.className));
+}
+
+Answer spoolAnswer(const Call& call, const SpooledResult& result) {
+    return {answerHead(call) + "<IRETURNVALUE>",
+            [spool = std::shared_ptr<const Spool>(result.spool),
+             position = std::size_t{0}](std::string& out) mutable {
+                constexpr std::size_t piece = 32768;
+                const std::size_t size = std::min(piece, spool->size() - position);
+                spool->read(position, size, out);
+                position += size;
+                return size > 0;
+            },
+            "</IRETURNVALUE>" + answerTail(call)};
 }
 
 Answer plainAnswer(const Call& call, const std::string& content) {

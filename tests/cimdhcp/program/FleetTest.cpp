@@ -187,7 +187,14 @@ TEST_F(ManyServers, AListThatCannotBeReadIsNobodysFailure) {
 TEST_F(ManyServers, AnInterruptionEndsItWithASum) {
     serve(1);
     const test::RawServer silent({});
-    const std::string hosts = hostsFile({servers_[0]->url(), silent.url(), silent.url() + "/b"});
+    // While the first answer is on its way to the shell and the signal on its way back,
+    // its thread may have begun with the next server or not, and the other one with its
+    // first.
+    std::vector<std::string> urls{servers_[0]->url()};
+    for (int number = 0; number < 20; ++number) {
+        urls.push_back(silent.url() + "/" + std::to_string(number));
+    }
+    const std::string hosts = hostsFile(urls);
     // The shell sends the signal as soon as the first answer is there.
     const Ended ended = runAs(
         "/bin/bash", {"-c", "coproc " + program() + " --hosts " + hosts +
@@ -196,8 +203,8 @@ TEST_F(ManyServers, AnInterruptionEndsItWithASum) {
                                 "kill -INT $pid\nwait $pid"});
     EXPECT_EQ(ended.status, 130);
     EXPECT_EQ(ended.out, servers_[0]->url() + "\t1\n");
-    EXPECT_THAT(ended.err, HasSubstr("  " + silent.url() + ": interrupted\n"));
-    EXPECT_THAT(ended.err, HasSubstr("cimdhcp: interrupted; 1 of 3 servers were not asked\n"));
+    EXPECT_THAT(ended.err, testing::ContainsRegex(
+                               "cimdhcp: interrupted; (18|19|20) of 21 servers were not asked\n"));
 }
 
 }  // namespace

@@ -54,6 +54,7 @@ class LiveMachine final : public SnapshotSource {
     [[nodiscard]] std::shared_ptr<const Snapshot> read() override;
 
   private:
+    [[nodiscard]] std::shared_ptr<const Snapshot> tryToRead();
     [[nodiscard]] ClientFacts readClients();
     void consultNetworkd(ClientFacts& clients);
     void watchProcesses(const ClientFacts& clients);
@@ -67,7 +68,8 @@ class LiveMachine final : public SnapshotSource {
     std::vector<WatchedPlace> places_;
     std::optional<ClientFacts> sockets_;  // where nothing else tells of who has them
     std::chrono::steady_clock::time_point networkdRest_;  // not to be asked before
-    std::unordered_set<std::string> reported_;
+    std::unordered_set<std::string> reported_;            // of the last reading
+    std::chrono::steady_clock::time_point troubleRest_;   // what is in it waits until then
 };
 
 }  // namespace ZR::Live
