@@ -113,7 +113,9 @@ struct Writer {
         add("max-connections", limits.connections);
         add("max-waiting", limits.waiting);
         add("max-enumerations", limits.sessions.sessions);
+        add("max-result", limits.result);
         add("workers", limits.workers);
+        add("max-stuck", limits.stuck);
         add("io-threads", limits.ioThreads);
         add("request-timeout", limits.request.count());
         add("answer-timeout", limits.answer.count());
