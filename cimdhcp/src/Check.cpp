@@ -12,8 +12,8 @@
 #include <utility>
 #include <variant>
 
-#include "cimdhcp/Client.h"
 #include "cimdhcp/DisplayText.h"
+#include "cimdhcp/EmbeddedClient.h"
 #include "cimdhcp/Failure.h"
 #include "cimdhcp/JsonFormat.h"
 #include "cimdhcp/PlatformSetup.h"
@@ -310,7 +310,7 @@ class Examination {
     const Options& options_;
     const std::vector<Directories>& installations_;
     std::vector<Finding> findings_;
-    std::optional<Client> client_;
+    std::optional<EmbeddedClient> client_;
     std::size_t dhcpInterfaces_ = 0;
 };
 

@@ -90,21 +90,23 @@ HOOK
             eventually test -n "$(sleep 0.3; cat "$work/client.pid")"
         }
         stop_client() {
-            kill -USR2 "$(<"$work/client.pid")"
+            signal_client USR2 "$(<"$work/client.pid")"
             eventually no_address "$1"
-            kill "$(<"$work/client.pid")"
+            signal_client TERM "$(<"$work/client.pid")"
         }
         said() {
             in_client sed -n "s/^$1=//p" /run/udhcpc.eth1.state
         }
         said_address() { said ip; }
         said_server() { said serverid; }
-        renew_client() { kill -USR1 "$(<"$work/client.pid")"; }
+        renew_client() { signal_client USR1 "$(<"$work/client.pid")"; }
         renamed_back=yes
         ;;
     networkd)
         networkd=/lib/systemd/systemd-networkd
         [[ -x $networkd ]] || { echo "needs $networkd"; exit 1; }
+        need dbus-daemon
+        need networkctl
         start_client() {
             in_client mkdir -p /run/systemd/netif/links /run/systemd/netif/leases /run/systemd/netif/lldp
             in_client chown -R systemd-network: /run/systemd/netif
@@ -123,8 +125,15 @@ Name=eth1 lan0
 DHCP=ipv4
 LinkLocalAddressing=no
 FILE
+            # Renewal is asked for over a bus. It stays when networkd is started again.
+            if ! in_client test -S /run/dbus/system_bus_socket; then
+                in_client mkdir -p /run/dbus
+                in_client dbus-daemon --system --nofork --nopidfile </dev/null >"$work/bus.log" 2>&1 &
+                eventually in_client test -S /run/dbus/system_bus_socket
+            fi
             in_client env container=laboratory $networkd </dev/null >"$work/client.log" 2>&1 &
         }
+        renew_client() { in_client networkctl renew eth1 </dev/null >>"$work/client.log" 2>&1; }
         stop_client() {
             local pid
             for pid in $(ip netns pids "$client"); do

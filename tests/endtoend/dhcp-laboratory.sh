@@ -1,11 +1,13 @@
 # Two machines in a laboratory, for tests to source: a DHCP server (dnsmasq) and a
 # client on the two ends of a veth pair, each in a network namespace of its own. The
-# client also has file systems of its own wherever DHCP clients write, so that nothing
-# of the machine that runs the test is touched or read.
+# client also has file systems of its own wherever DHCP clients write, and processes of
+# its own, so that nothing of the machine that runs the test is touched or read: clients
+# of other tests, too, would be seen there, and could not be told from ours by all users.
 #
 # The test has set `program` to the path of cimdhcp. It gets
 #   $work           a directory that goes with the test
 #   in_client ...   runs a command on the client's machine, in_server ... on the server's
+#   signal_client SIGNAL NUMBER     sends a signal to a process of the client's machine
 #   cimdhcp ...     runs the program on the client's machine
 #   start_server    starts the server, with further options of dnsmasq
 #   fail, expect, eventually, look, seen, value, kernel_address    see below
@@ -49,10 +51,11 @@ expect() {
     [[ $output == *"$text"* ]] || fail "$* lacks \"$text\": $output"
 }
 
-# eventually COMMAND...: the command succeeds within ten seconds.
+# eventually COMMAND...: the command succeeds within half a minute, which a busy machine
+# may need.
 eventually() {
     local attempt
-    for ((attempt = 0; attempt < 100; ++attempt)); do
+    for ((attempt = 0; attempt < 300; ++attempt)); do
         "$@" >/dev/null 2>&1 && return 0
         sleep 0.1
     done
@@ -67,23 +70,29 @@ ip -n "$server" link set zrs$$ up
 ip -n "$client" link set lo up
 ip -n "$client" link set eth1 up
 
-# One process holds the client's file systems. /sys is read-only there, as in a
+# One process holds the client's file systems and processes, and is the parent of those
+# that lose theirs: it has to see their ends, which their clients wait for. /sys is read-only there, as in a
 # container: programs then do not wait for a device manager that is not there.
 mkdir -p "$work/data"
 cp /etc/resolv.conf "$work/resolv.conf" 2>/dev/null || : >"$work/resolv.conf"
-ip netns exec "$client" unshare --mount sh -c '
+ip netns exec "$client" unshare --mount --pid --fork --kill-child --mount-proc bash -c '
     mount --make-rprivate / &&
     mount -t tmpfs tmpfs /run && mount -t tmpfs tmpfs /var/lib &&
     mkdir /var/lib/dhcp /var/lib/dhcpcd &&
     { [ ! -e /etc/resolv.conf ] || mount --bind "$1/resolv.conf" /etc/resolv.conf; } &&
-    mount -o remount,bind,ro /sys && : >"$1/ready" && exec sleep infinity' sh "$work" \
+    mount -o remount,bind,ro /sys && : >"$1/ready" &&
+    while :; do sleep 3600 & wait; done' bash "$work" \
     >"$work/holder.log" 2>&1 &
 holder=$!
 disown  # its end is no news
 eventually test -e "$work/ready" || fail "no file systems: $(<"$work/holder.log")"
 
 in_client() {
-    nsenter --target="$holder" --net --mount -- "$@"
+    nsenter --target="$holder" --net --mount --pid="/proc/$holder/ns/pid_for_children" -- "$@"
+}
+# signal_client SIGNAL NUMBER: of a process on the client's machine, by its number there.
+signal_client() {
+    in_client sh -c 'kill -s "$1" "$2"' sh "$1" "$2"
 }
 in_server() {
     ip netns exec "$server" "$@"

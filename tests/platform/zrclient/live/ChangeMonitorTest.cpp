@@ -164,6 +164,45 @@ TEST_F(ChangeMonitorTest, AnAncestorMayBeWatchedForItself) {
     EXPECT_TRUE(monitor_.changed());
 }
 
+TEST_F(ChangeMonitorTest, SeveralPlacesMayWaitForOneDirectory) {
+    const std::array<const char*, 4> places{"/run/a/b/c", "/run/a/b", "/run/a/d", "/run/a"};
+    for (const char* place : places) {
+        watch(place);
+    }
+    begin();
+    EXPECT_FALSE(monitor_.changed());
+    makeDirectory("/run/a");
+    EXPECT_TRUE(monitor_.changed());
+    begin();
+    makeDirectory("/run/a/b/c");
+    EXPECT_TRUE(monitor_.changed());
+    begin();
+    EXPECT_FALSE(monitor_.changed());
+    makeDirectory("/run/a/d");
+    EXPECT_TRUE(monitor_.changed());
+    begin();
+    for (const char* place : places) {
+        root_.write(std::string{place} + "/x", "x");
+        EXPECT_TRUE(monitor_.changed()) << place;
+        begin();
+        EXPECT_FALSE(monitor_.changed()) << place;
+    }
+}
+
+TEST_F(ChangeMonitorTest, AFileInTheWayOfADirectoryIsWaitedFor) {
+    root_.write("/run/db", "x");
+    watch("/run/db/dhcpcd");
+    watch("/run/db/other");
+    begin();
+    EXPECT_FALSE(monitor_.changed());
+    std::filesystem::remove(root_.path("/run/db"));
+    makeDirectory("/run/db/other");
+    EXPECT_TRUE(monitor_.changed());
+    begin();
+    root_.write("/run/db/other/x", "x");
+    EXPECT_TRUE(monitor_.changed());
+}
+
 TEST_F(ChangeMonitorTest, ADirectoryThatGoesAndComesAgainIsWatchedAgain) {
     makeDirectory("/leases");
     watch("/leases");

@@ -110,6 +110,16 @@ TEST_F(DhclientTest, FilesOfAllItsStartersAreRead) {
                 ElementsAre("192.0.2.5", "192.0.2.4", "192.0.2.3", "192.0.2.2", "192.0.2.1"));
 }
 
+TEST_F(DhclientTest, WhatTheStartFromTheNetworkLeftIsRead) {
+    root_.write("/run/initramfs/net.eth1.lease", lease("eth1", "192.0.2.7", "192.0.2.1"));
+    root_.write("/run/initramfs/net.eth1.gw", lease("eth1", "192.0.2.7", "192.0.2.2"));
+    root_.write("/run/initramfs/dhclient.lease", lease("eth1", "192.0.2.7", "192.0.2.3"));
+    root_.write("/var/lib/dhcp/net.eth1.lease", lease("eth1", "192.0.2.7", "192.0.2.4"));
+    const ClientFacts facts = read();
+    EXPECT_THAT(servers(facts), ElementsAre("192.0.2.1"));
+    EXPECT_FALSE(facts.leases[0].clientAlive);
+}
+
 TEST_F(DhclientTest, OtherFilesBesideThemAreNotRead) {
     root_.write("/var/lib/NetworkManager/internal-1-eth1.lease",
                 lease("eth1", "192.0.2.7", "192.0.2.1"));

@@ -2,11 +2,28 @@
 
 #include <gtest/gtest.h>
 
+#include <sstream>
+
+#include "Support.h"
+
 namespace ZR::Live {
 namespace {
 
 std::optional<ClientProcess> parse(std::vector<std::string_view> arguments) {
     return parseDhcp6cArguments(arguments);
+}
+
+TEST(Dhcp6cArguments, Captured) {
+    const std::string line = sample("wide-dhcpv6/proc-cmdline.txt");
+    std::istringstream words{line};
+    std::vector<std::string> texts;
+    for (std::string word; words >> word;) {
+        texts.push_back(word);
+    }
+    EXPECT_EQ(
+        parse({texts.begin(), texts.end()}),
+        (ClientProcess{
+            .client = Client::Dhcp6c, .interfaces = {"eth1"}, .leaseFile = "", .ipv6 = true}));
 }
 
 TEST(Dhcp6cArguments, ItsInterfacesStandBehindTheOptions) {

@@ -14,7 +14,7 @@ TEST(ClientNames, AreAllDifferent) {
     for (const Client client :
          {Client::Networkd, Client::NetworkManager, Client::Wicked, Client::Dhclient,
           Client::Dhcpcd, Client::Udhcpc, Client::Dhcp6c, Client::Ipconfig, Client::Netplan,
-          Client::Ifupdown, Client::Ifcfg}) {
+          Client::Ifupdown, Client::Ifcfg, Client::Connman, Client::KernelBoot}) {
         EXPECT_TRUE(names.insert(nameOf(client)).second) << nameOf(client);
         EXPECT_NE(nameOf(client), "unknown");
     }
@@ -27,6 +27,21 @@ TEST(ClientFacts, AManagerOfAnotherNamespaceDoesNotRunHere) {
     EXPECT_FALSE(running(Client::Wicked, Where::Elsewhere).runs(Client::Wicked));
     EXPECT_FALSE(running(Client::Wicked).runs(Client::Networkd));
     EXPECT_FALSE(ClientFacts{}.runs(Client::Wicked));
+}
+
+TEST(ClientFacts, SocketsStandAloneWhereNoProgramThatCouldHaveThemIsSeen) {
+    ClientFacts facts;
+    EXPECT_FALSE(facts.socketsStandAlone());
+    facts.sockets = {{.address = "192.0.2.7", .peer = ""}};
+    EXPECT_TRUE(facts.socketsStandAlone());
+    facts.managers = running(Client::Networkd, ManagerProcess::Where::Elsewhere).managers;
+    facts.processes = {{.client = Client::Dhcp6c, .interfaces = {}, .leaseFile = "", .ipv6 = true}};
+    EXPECT_TRUE(facts.socketsStandAlone());
+    facts.processes[0].ipv6 = false;
+    EXPECT_FALSE(facts.socketsStandAlone());
+    facts.processes.clear();
+    facts.managers = running(Client::Networkd).managers;
+    EXPECT_FALSE(facts.socketsStandAlone());
 }
 
 TEST(ClientFacts, AManagerRunsElsewhereWhereItRunsInNoOtherPlace) {

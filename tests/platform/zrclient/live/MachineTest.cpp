@@ -100,6 +100,48 @@ TEST_F(MachineTest, ARenamedLinkOfUdhcpcHasAnAddressWithoutAnEnd) {
     EXPECT_EQ(machine().interfaces()[1].leases.size(), 0U);
 }
 
+TEST_F(MachineTest, AClientThatNamesNoLinkMeansTheOneThatHasItsAddress) {
+    facts_.clients.leases = {lease("", "192.0.2.3")};
+    EXPECT_EQ(first().leases.size(), 0U);
+    EXPECT_THAT(machine().interfaces()[1].leases, ElementsAre(Pointee(facts_.clients.leases[0])));
+    facts_.addresses[0].text = "192.0.2.3";
+    EXPECT_EQ(machine().interfaces()[1].leases.size(), 0U) << "two links have it";
+}
+
+TEST_F(MachineTest, WhatTheKernelWasGivenIsTheOnlyAddressThatNobodyElseSpeaksFor) {
+    facts_.clients.boot = {.bootp = true, .server = "192.0.2.1", .origin = "pnp"};
+    for (Address& address : facts_.addresses) {
+        address.validLifetime = Address::infinite;
+    }
+    EXPECT_THAT(first().leases, IsEmpty()) << "there are two";
+    facts_.addresses[1] = {.ifindex = 3, .family = AF_INET6, .text = "2001:db8::3"};
+    EXPECT_THAT(first().leases, ElementsAre(Pointee(Lease{.client = Client::KernelBoot,
+                                                          .interfaceName = "",
+                                                          .ifindex = 2,
+                                                          .family = AF_INET,
+                                                          .address = "192.0.2.2",
+                                                          .server = "192.0.2.1",
+                                                          .bootp = true,
+                                                          .expires = Lease::never,
+                                                          .origin = "pnp"})));
+    facts_.addresses[0].validLifetime = 600;
+    EXPECT_THAT(first().leases, IsEmpty()) << "the kernel's has no end";
+    facts_.addresses[0].validLifetime = Address::infinite;
+    facts_.clients.configurations = {{.client = Client::Ifupdown,
+                                      .interfaceName = "eth2",
+                                      .dhcp4 = false,
+                                      .dhcp6 = {},
+                                      .staticAddresses = {}}};
+    EXPECT_THAT(first().leases, IsEmpty());
+    facts_.clients.configurations.clear();
+    facts_.clients.processes = {
+        {.client = Client::Udhcpc, .interfaces = {"eth2"}, .leaseFile = ""}};
+    EXPECT_THAT(first().leases, IsEmpty());
+    facts_.clients.processes.clear();
+    facts_.addresses.clear();
+    EXPECT_THAT(first().leases, IsEmpty());
+}
+
 TEST_F(MachineTest, AClientThatNamesLinksByIndexIsTakenAtItsWord) {
     facts_.clients.leases = {lease("", "192.0.2.3")};
     facts_.clients.leases[0].ifindex = 9;

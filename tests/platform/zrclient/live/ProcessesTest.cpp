@@ -101,12 +101,14 @@ TEST_F(ProcessesTest, ManagersAreToldWithWhereTheyRun) {
     add("11", "systemd-network", "/lib/systemd/systemd-networkd");
     add("12", "NetworkManager", "/usr/sbin/NetworkManager", "net:[2]");
     add("13", "wickedd-dhcp4", "", nullptr);
+    add("14", "connmand", "/usr/sbin/connmand");
     EXPECT_THAT(
         read().managers,
         testing::UnorderedElementsAre(
             ManagerProcess{.client = Client::Networkd, .where = Where::Here, .pid = 11},
             ManagerProcess{.client = Client::NetworkManager, .where = Where::Elsewhere, .pid = 12},
-            ManagerProcess{.client = Client::Wicked, .where = Where::Unknown, .pid = 13}));
+            ManagerProcess{.client = Client::Wicked, .where = Where::Unknown, .pid = 13},
+            ManagerProcess{.client = Client::Connman, .where = Where::Here, .pid = 14}));
 }
 
 TEST_F(ProcessesTest, AClientWhoseNamespaceIsForbiddenIsReported) {
@@ -140,6 +142,45 @@ TEST_F(ProcessesTest, WhatIsNoProcessIsNotLookedAt) {
     add("0", "dhclient", commandLine_);
     std::filesystem::create_directories(proc_.path("/21"));
     EXPECT_THAT(read().processes, IsEmpty());
+}
+
+// A client's name on a thread of the kernel shows whether it was looked at.
+TEST_F(ProcessesTest, ThreadsOfTheKernelAreNotLookedAt) {
+    proc_.write("/2/stat", "2 (k) thr ead) S 0 0 0 0 -1 2129984 0 0\n");
+    proc_.write("/2/task/2/children", "17 4 ");
+    add("4", "dhclient", commandLine_);
+    add("17", "dhclient", commandLine_);
+    add("174", "dhclient", commandLine_);
+    const ClientFacts facts = read();
+    ASSERT_EQ(facts.processes.size(), 1U);
+    EXPECT_EQ(facts.processes[0].pid, 174);
+}
+
+TEST_F(ProcessesTest, ChildrenOfAProgramWithTheKernelsNumberAreLookedAt) {
+    for (const char* status : {"2 (kthreadd) S 0 0 0 0 -1 4194560 0 0\n", "2 (kthreadd) S 0",
+                               "2 kthreadd S 0 0 0 0 -1 2129984 0 0\n", ""}) {
+        proc_.write("/2/stat", status);
+        proc_.write("/2/task/2/children", "17 ");
+        add("17", "dhclient", commandLine_);
+        EXPECT_EQ(read().processes.size(), 1U) << status;
+        std::filesystem::remove_all(proc_.path("/17"));
+    }
+}
+
+TEST_F(ProcessesTest, AnyListOfThreadsOfTheKernelIsRead) {
+    proc_.write("/2/stat", "2 (kthreadd) S 0 0 0 0 -1 2129984 0 0\n");
+    add("17", "dhclient", commandLine_);
+    EXPECT_EQ(read().processes.size(), 1U) << "the kernel need not tell";
+    std::string many;
+    for (int number = 100; number < 5'000; ++number) {
+        many += std::to_string(number) + " ";
+    }
+    for (const std::string& children : {std::string{"x 17x  -3 99999999999 "}, many}) {
+        proc_.write("/2/task/2/children", children);
+        EXPECT_EQ(read().processes.size(), 1U);
+        proc_.write("/2/task/2/children", children + "17 ");
+        EXPECT_THAT(read().processes, IsEmpty());
+    }
 }
 
 TEST_F(ProcessesTest, WithoutAProcessFileSystemThereIsAReason) {

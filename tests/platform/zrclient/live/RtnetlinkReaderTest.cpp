@@ -238,20 +238,43 @@ TEST_F(RtnetlinkReaderTest, AMessageOfALengthWithTheHighestBitIsLeftOutAndReport
 }
 
 TEST_F(RtnetlinkReaderTest, SilenceEndsAtTheDeadline) {
-    const auto start = steady_clock::now();
     const NetworkState state = read({{}}, milliseconds{60});
-    const auto took = steady_clock::now() - start;
     EXPECT_THAT(state.links, IsEmpty());
     EXPECT_THAT(state.complaints, ElementsAre(HasSubstr("no answer: ")));
-    EXPECT_LT(took, milliseconds{1000});
 }
 
 TEST_F(RtnetlinkReaderTest, ADumpThatNeverEndsEndsAtTheDeadline) {
-    const auto start = steady_clock::now();
     const NetworkState state = read({{Step::endless({linkMessage(2, "again")})}}, milliseconds{60});
-    EXPECT_LT(steady_clock::now() - start, milliseconds{1000});
     EXPECT_THAT(state.links, IsEmpty());
     EXPECT_THAT(state.complaints, ElementsAre(HasSubstr("no complete answer in time")));
+}
+
+// No real kernel can be made to keep a question at will; so this one does.
+TEST_F(RtnetlinkReaderTest, TimeForWhichTheKernelKeepsTheQuestionIsNotTheAnswers) {
+    auto transport = std::make_unique<ScriptedTransport>(std::deque<std::vector<Step>>{
+        {parts({linkMessage(1, "lo")}), parts({linkMessage(2, "eth0"), done()})}, someAddresses()});
+    transport->holdQuestions(milliseconds{30});
+    RtnetlinkReader reader{std::move(transport)};
+    const NetworkState state = reader.read(steady_clock::now() + milliseconds{20});
+    EXPECT_THAT(names(state), ElementsAre("lo", "eth0"));
+    EXPECT_EQ(state.addresses.size(), 1U);
+    EXPECT_TRUE(state.certain);
+    EXPECT_THAT(state.complaints, IsEmpty());
+}
+
+TEST_F(RtnetlinkReaderTest, AfterTheDeadlineNothingIsAskedForAgain) {
+    const Message interrupted = linkMessage(2, "busy", 0, NLM_F_MULTI | NLM_F_DUMP_INTR);
+    auto transport = std::make_unique<ScriptedTransport>(std::deque<std::vector<Step>>{
+        {parts({interrupted, done()})}, someAddresses(), someLinks()});
+    transport->holdQuestions(milliseconds{30});
+    const ScriptedTransport& held = *transport;
+    RtnetlinkReader reader{std::move(transport)};
+    const NetworkState state = reader.read(steady_clock::now() + milliseconds{20});
+    EXPECT_EQ(held.asked(), 2);
+    EXPECT_THAT(names(state), ElementsAre("busy"));
+    EXPECT_EQ(state.addresses.size(), 1U);
+    EXPECT_FALSE(state.certain) << "to be read again";
+    EXPECT_THAT(state.complaints, ElementsAre("network links: changed while they were read"));
 }
 
 TEST_F(RtnetlinkReaderTest, AfterAFailureTheNextReadingBeginsAnew) {

@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <chrono>
 #include <cstring>
 #include <deque>
 #include <optional>
@@ -59,6 +60,9 @@ class ScriptedTransport final : public NetlinkTransport {
         : answers_(std::move(answers)) {}
 
     void refuseToOpen(int error) { openError_ = error; }
+    /// Keeps whoever asks in the question for so long, as a kernel does whose links are
+    /// being changed by others.
+    void holdQuestions(std::chrono::milliseconds time) { held_ = time; }
     [[nodiscard]] int opened() const { return opened_; }
     [[nodiscard]] int asked() const { return asked_; }
     [[nodiscard]] std::size_t largestBuffer() const { return largestBuffer_; }
@@ -71,6 +75,7 @@ class ScriptedTransport final : public NetlinkTransport {
 
     int send(std::span<const std::byte> message) override {
         ++asked_;
+        std::this_thread::sleep_for(held_);
         nlmsghdr question{};
         std::memcpy(&question, message.data(), sizeof question);
         sequence_ = question.nlmsg_seq;
@@ -111,6 +116,7 @@ class ScriptedTransport final : public NetlinkTransport {
     std::deque<std::vector<Step>> answers_;
     std::deque<Step> pending_;
     int openError_ = 0;
+    std::chrono::milliseconds held_{0};
     int opened_ = 0;
     int asked_ = 0;
     std::uint32_t sequence_ = 0;

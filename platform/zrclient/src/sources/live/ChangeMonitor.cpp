@@ -13,6 +13,7 @@
 #include <cerrno>
 #include <cstddef>
 #include <cstring>
+#include <functional>
 #include <system_error>
 #include <utility>
 
@@ -61,8 +62,9 @@ void ChangeMonitor::begin(const std::vector<WatchedPlace>& places,
     }
     if (watches_) {
         if (rearm_ || places != places_) {
-            rearm_ = false;
+            rearm_ = true;  // until all is done
             watchAll(places, complaints);
+            rearm_ = false;
         }
     }
     changed_ = false;
@@ -147,44 +149,76 @@ void ChangeMonitor::openWatches(std::vector<std::string>& complaints) {
     }
 }
 
+/// What one round of watching has come to know. Many places lie in few directories, and
+/// below few that are missing: the kernel is asked once about each.
+struct ChangeMonitor::Arming {
+    struct Directory {
+        int watch = -1;
+        bool full = false;  // with all its events, else for newcomers only
+    };
+
+    Interests interests;
+    std::map<std::string, Directory, std::less<>> watched;
+    /// Missing directories, with the watch above them, which was there before they were
+    /// found missing: when they come, that is told.
+    std::map<std::string, int, std::less<>> missing;
+
+    /// Waits for the nearest missing directory on the way to this one, if one is known.
+    bool awaits(std::string_view directory) {
+        for (std::size_t end = directory.size(); end != 0 && end != std::string_view::npos;
+             end = directory.rfind('/', end - 1)) {
+            const std::string_view path = directory.substr(0, end);
+            const auto found = missing.find(path);
+            if (found != missing.end()) {
+                interests[found->second].push_back(
+                    {.name = std::string{path.substr(path.rfind('/') + 1)}, .ancestor = true});
+                return true;
+            }
+        }
+        return false;
+    }
+};
+
 void ChangeMonitor::watchAll(const std::vector<WatchedPlace>& places,
                              std::vector<std::string>& complaints) {
-    Interests interests;
+    Arming arming;
     for (const WatchedPlace& place : places) {
-        watch(place, interests, complaints);
+        watch(place, arming, complaints);
     }
     for (const auto& [watch, unused] : interests_) {
-        if (!interests.contains(watch)) {
+        if (!arming.interests.contains(watch)) {
             // Fails when the directory went meanwhile, and the watch with it.
             static_cast<void>(::inotify_rm_watch(watches_.get(), watch));
         }
     }
-    interests_ = std::move(interests);
+    interests_ = std::move(arming.interests);
     places_ = places;
 }
 
-void ChangeMonitor::watch(const WatchedPlace& place, Interests& interests,
+void ChangeMonitor::watch(const WatchedPlace& place, Arming& arming,
                           std::vector<std::string>& complaints) {
-    // Of a missing directory the nearest ancestor counts only once a second look, with
-    // the watch on it begun, finds no nearer one: it may have been made in between.
-    int previous = -1;
+    const auto notice = [&](int watch) {
+        arming.interests[watch].push_back({.name = place.namePrefix, .ancestor = false});
+    };
+    if (const auto known = arming.watched.find(place.directory);
+        known != arming.watched.end() && known->second.full) {
+        notice(known->second.watch);
+        return;
+    }
+    // Directories may come and go meanwhile, but not for ever.
     for (int attempt = 0; attempt < 8; ++attempt) {
+        if (arming.awaits(place.directory)) {
+            return;
+        }
         const int directory = addWatch(watches_.get(), place.directory, directoryEvents);
         if (directory >= 0) {
-            interests[directory].push_back({.name = place.namePrefix, .ancestor = false});
+            arming.watched[place.directory] = {.watch = directory, .full = true};
+            notice(directory);
             return;
         }
-        std::string missing;
-        const int ancestor = isAbsent(errno) ? watchAncestor(place.directory, missing) : -1;
-        if (ancestor < 0) {
+        if (!isAbsent(errno) || watchAncestor(place.directory, arming) < 0) {
             break;
         }
-        auto& ofAncestor = interests[ancestor];
-        if (ancestor == previous) {
-            ofAncestor.push_back({.name = missing, .ancestor = true});
-            return;
-        }
-        previous = ancestor;
     }
     const int error = errno;
     if (error == EACCES) {
@@ -197,20 +231,41 @@ void ChangeMonitor::watch(const WatchedPlace& place, Interests& interests,
     blind_ = true;
 }
 
-/// Watches the nearest existing ancestor. `missing` becomes the name below it
-/// that the way to the directory lacks. -1 with errno set when there is none.
-int ChangeMonitor::watchAncestor(std::string directory, std::string& missing) const {
+/// Watches the nearest existing ancestor of a directory that was just found missing. What
+/// is missing below it counts as such once it was not there with that watch begun. -1
+/// with errno set when there is nothing to watch.
+int ChangeMonitor::watchAncestor(std::string directory, Arming& arming) const {
+    const auto await = [&](const std::string& path) {
+        const int watch = addWatch(watches_.get(), path, ancestorEvents);
+        if (watch >= 0) {
+            arming.watched[path].watch = watch;
+            arming.interests[watch];  // kept, even if nothing is awaited there in the end
+        }
+        return watch;
+    };
     while (directory.size() > 1) {
         const std::size_t slash = directory.rfind('/');
         if (slash == std::string::npos) {
             break;
         }
-        missing = directory.substr(slash + 1);
-        directory.resize(std::max<std::size_t>(slash, 1));
-        const int watch = addWatch(watches_.get(), directory, ancestorEvents);
-        if (watch >= 0 || !isAbsent(errno)) {
-            return watch;
+        const std::string parent = directory.substr(0, std::max<std::size_t>(slash, 1));
+        if (const auto known = arming.watched.find(parent); known != arming.watched.end()) {
+            arming.missing.emplace(directory, known->second.watch);
+            return known->second.watch;
         }
+        const int above = await(parent);
+        if (above >= 0) {
+            const int found = await(directory);
+            if (found < 0 && isAbsent(errno)) {
+                arming.missing.emplace(directory, above);
+                return above;
+            }
+            return found;
+        }
+        if (!isAbsent(errno)) {
+            return above;
+        }
+        directory = parent;
     }
     errno = ENOENT;
     return -1;

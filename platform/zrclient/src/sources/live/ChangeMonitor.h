@@ -49,12 +49,13 @@ class ChangeMonitor {
     };
     using Interests = std::map<int, std::vector<Interest>>;
 
+    struct Arming;
+
     void openSubscription(std::vector<std::string>& complaints);
     void openWatches(std::vector<std::string>& complaints);
     void watchAll(const std::vector<WatchedPlace>& places, std::vector<std::string>& complaints);
-    void watch(const WatchedPlace& place, Interests& interests,
-               std::vector<std::string>& complaints);
-    int watchAncestor(std::string directory, std::string& missing) const;
+    void watch(const WatchedPlace& place, Arming& arming, std::vector<std::string>& complaints);
+    int watchAncestor(std::string directory, Arming& arming) const;
     bool drainSubscription();
     bool drainWatches();
     bool concerns(int watch, std::uint32_t mask, std::string_view name);

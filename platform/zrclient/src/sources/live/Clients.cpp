@@ -2,11 +2,13 @@
 
 #include <array>
 
+#include "Connman.h"
 #include "Dhclient.h"
 #include "Dhcpcd.h"
 #include "Ifcfg.h"
 #include "Ifupdown.h"
 #include "Ipconfig.h"
+#include "KernelBoot.h"
 #include "Netplan.h"
 #include "NetworkManager.h"
 #include "Networkd.h"
@@ -29,9 +31,11 @@ constexpr std::array networkManagerPlaces{
     ClientPlace{networkManagerProfiles[2], ""}};
 constexpr std::array wickedPlaces{ClientPlace{wickedDirectories[0], wickedLeasePrefix},
                                   ClientPlace{wickedDirectories[1], wickedLeasePrefix}};
+constexpr std::array connmanPlaces{ClientPlace{connmanDirectory, ""}};
 constexpr std::array dhclientPlaces{ClientPlace{dhclientDirectories[0].path, dhclientNamePrefix},
                                     ClientPlace{dhclientDirectories[1].path, dhclientNamePrefix},
                                     ClientPlace{dhclientDirectories[2].path, dhclientNamePrefix},
+                                    ClientPlace{dracutDirectory, dracutPrefix},
                                     ClientPlace{pidDirectory, dhclientNamePrefix}};
 constexpr std::array dhcpcdPlaces{
     ClientPlace{dhcpcdDirectories[0].path, dhcpcdDirectories[0].namePrefix},
@@ -48,16 +52,19 @@ constexpr std::array ifcfgPlaces{ClientPlace{ifcfgDirectories[0], ifcfgPrefix},
                                  ClientPlace{ifcfgDirectories[1], ifcfgPrefix}};
 
 // Managers before the clients that they may start, and those before what is left of
-// the boot. Sockets have no files that could be watched.
+// the boot. The files of /proc
+// cannot be watched.
 constexpr std::array sources{
     ClientSource{readProcesses, dhcp6cPlaces},
     ClientSource{readNetworkd, networkdPlaces},
     ClientSource{readNetworkManager, networkManagerPlaces},
     ClientSource{readWicked, wickedPlaces},
+    ClientSource{readConnman, connmanPlaces},
     ClientSource{readDhclient, dhclientPlaces},
     ClientSource{readDhcpcd, dhcpcdPlaces},
     ClientSource{readUdhcpc, udhcpcPlaces},
     ClientSource{readIpconfig, ipconfigPlaces},
+    ClientSource{readKernelBoot, {}},
     ClientSource{readNetplan, netplanPlaces},
     ClientSource{readIfupdown, ifupdownPlaces},
     ClientSource{readIfcfg, ifcfgPlaces},

@@ -55,9 +55,8 @@ struct LeaseFile {
     std::vector<const ClientProcess*> keepers;       // clients that keep it now
 };
 
-bool isLeaseFileName(std::string_view name) {
-    return name.starts_with(dhclientNamePrefix) &&
-           (name.ends_with(".leases") || name.ends_with(".lease"));
+bool isLeaseFileName(std::string_view name, std::string_view prefix) {
+    return name.starts_with(prefix) && (name.ends_with(".leases") || name.ends_with(".lease"));
 }
 
 /// The lease files of the machine, each once.
@@ -88,9 +87,9 @@ class LeaseFiles {
         }
     }
 
-    void addDirectory(const std::string& path) {
+    void addDirectory(const std::string& path, std::string_view prefix) {
         for (const std::string& name : listOptionalDirectory(path, facts_.complaints)) {
-            if (isLeaseFileName(name)) {
+            if (isLeaseFileName(name, prefix)) {
                 add(pathIn(path, name), nullptr);
             }
         }
@@ -203,8 +202,9 @@ void readDhclient(const Roots& roots, ClientFacts& facts) {
         }
     }
     for (const DhclientDirectory& directory : dhclientDirectories) {
-        files.addDirectory(roots.path(directory.path));
+        files.addDirectory(roots.path(directory.path), dhclientNamePrefix);
     }
+    files.addDirectory(roots.path(dracutDirectory), dracutPrefix);
     for (const LeaseFile& file : std::move(files).newestFirst()) {
         addLeases(file, facts);
     }

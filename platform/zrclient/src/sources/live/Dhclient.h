@@ -24,6 +24,11 @@ inline constexpr std::array<DhclientDirectory, 3> dhclientDirectories{{
 }};
 inline constexpr std::string_view dhclientNamePrefix = "dhclient";
 
+/// Where the start of the system from the network (dracut) leaves net.INTERFACE.lease, of
+/// a dhclient that has ended since.
+inline constexpr std::string_view dracutDirectory = "/run/initramfs";
+inline constexpr std::string_view dracutPrefix = "net.";
+
 /// What a command line says, program name included. nullopt for a client that
 /// runs only to give leases back or to end another (-r, -x), and for none at all.
 [[nodiscard]] std::optional<ClientProcess> parseDhclientArguments(

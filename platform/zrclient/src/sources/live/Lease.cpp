@@ -12,6 +12,8 @@ std::string_view nameOf(Client client) noexcept {
             return "NetworkManager";
         case Client::Wicked:
             return "wicked";
+        case Client::Connman:
+            return "connman";
         case Client::Dhclient:
             return "dhclient";
         case Client::Dhcpcd:
@@ -22,6 +24,8 @@ std::string_view nameOf(Client client) noexcept {
             return "dhcp6c";
         case Client::Ipconfig:
             return "ipconfig";
+        case Client::KernelBoot:
+            return "kernel ip=";
         case Client::Netplan:
             return "netplan";
         case Client::Ifupdown:
@@ -41,6 +45,15 @@ bool ClientFacts::runs(Client client) const noexcept {
     return std::any_of(managers.begin(), managers.end(), [client](const ManagerProcess& manager) {
         return manager.client == client && manager.where != ManagerProcess::Where::Elsewhere;
     });
+}
+
+bool ClientFacts::socketsStandAlone() const noexcept {
+    return !sockets.empty() &&
+           std::none_of(processes.begin(), processes.end(),
+                        [](const ClientProcess& process) { return !process.ipv6; }) &&
+           std::none_of(managers.begin(), managers.end(), [](const ManagerProcess& manager) {
+               return manager.where != ManagerProcess::Where::Elsewhere;
+           });
 }
 
 bool ClientFacts::runsElsewhere(Client client) const noexcept {

@@ -14,11 +14,13 @@ enum class Client : std::uint8_t {
     Networkd,
     NetworkManager,
     Wicked,
+    Connman,
     Dhclient,
     Dhcpcd,
     Udhcpc,
     Dhcp6c,
     Ipconfig,
+    KernelBoot,
     Netplan,
     Ifupdown,
     Ifcfg,
@@ -34,8 +36,8 @@ struct Lease {
     static constexpr std::int64_t never = std::numeric_limits<std::int64_t>::max();
 
     Client client{};
-    std::string interfaceName;  ///< empty when the client names links by index
-    std::uint32_t ifindex = 0;  ///< 0 when the client names links by name
+    std::string interfaceName;  ///< empty when the client names links by index, or none at all
+    std::uint32_t ifindex = 0;  ///< 0 when the client names links by name, or none at all
     std::uint8_t family = 0;    ///< AF_INET or AF_INET6
     std::string address;        ///< canonical text
     std::string server;         ///< canonical text; empty when the client does not keep it
@@ -102,6 +104,16 @@ struct PortSocket {
     bool operator==(const PortSocket&) const = default;
 };
 
+/// What the kernel was given when it asked for an address at its start (ip=). It does not
+/// tell which address that was, nor on which link.
+struct BootAnswer {
+    bool bootp = false;  ///< came by BOOTP, else by DHCP
+    std::string server;  ///< of the boot files, canonical IPv4 text; empty for none
+    std::string origin;  ///< the file that says so
+
+    bool operator==(const BootAnswer&) const = default;
+};
+
 /// A directory that was read: all its files, or those of a name prefix.
 struct WatchedPlace {
     std::string directory;
@@ -123,6 +135,7 @@ struct ClientFacts {
     std::vector<ClientProcess> processes;
     std::vector<ManagerProcess> managers;
     std::vector<PortSocket> sockets;
+    std::optional<BootAnswer> boot;
     std::vector<std::uint32_t> packetLinks;  ///< where a packet socket hears IPv4
     std::vector<WatchedPlace> places;        ///< what was read beyond the fixed places
     std::vector<std::string> complaints;
@@ -130,6 +143,10 @@ struct ClientFacts {
     /// Whether a program that manages links runs for this network namespace. One
     /// whose namespace is hidden is believed: the files that it left are beside ours.
     [[nodiscard]] bool runs(Client client) const noexcept;
+
+    /// Whether the sockets may be all that there is to see of a DHCPv4 client: no program
+    /// that could have them was found for this network namespace.
+    [[nodiscard]] bool socketsStandAlone() const noexcept;
 
     /// Whether such a program runs for other network namespaces alone: the indexes in
     /// its files are then those of other links.

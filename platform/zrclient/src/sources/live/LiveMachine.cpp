@@ -4,7 +4,9 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <cerrno>
 #include <iterator>
+#include <system_error>
 #include <unordered_set>
 #include <utility>
 #include <variant>
@@ -12,6 +14,7 @@
 #include "Clients.h"
 #include "Decide.h"
 #include "IpmiDevice.h"
+#include "Sockets.h"
 #include "tklogger/TKLogger.h"
 #include "zrclient/LiveSource.h"
 #include "zrcommon/SystemName.h"
@@ -20,6 +23,10 @@ namespace ZR::Live {
 namespace {
 
 constexpr int errorLevel = 6000;
+
+// What could not be read is tried again at the next request, and, when that was of no
+// use, after so long: what is in the way may end without a sign.
+constexpr std::chrono::seconds troublePause{1};
 
 // Leaves time for the files, out of the 250 ms that a reading may take.
 constexpr std::chrono::milliseconds kernelTime{150};
@@ -88,7 +95,19 @@ LiveMachine::LiveMachine(Surroundings surroundings)
 
 bool LiveMachine::changed() {
     // Being asked is what moves the talk with the service processor on.
-    return processor_.changed() || monitor_.changed();
+    return processor_.changed() || monitor_.changed() || socketsChanged() ||
+           (!reported_.empty() && surroundings_.uptime() >= troubleRest_);
+}
+
+/// Nothing tells when a socket is closed. Where it is all that was seen of a client, it is
+/// looked at again with every question.
+bool LiveMachine::socketsChanged() const {
+    if (!sockets_) {
+        return false;
+    }
+    ClientFacts now;
+    readSockets(surroundings_.roots, now);
+    return now.sockets != sockets_->sockets || now.packetLinks != sockets_->packetLinks;
 }
 
 bool LiveMachine::awaiting() {
@@ -98,6 +117,16 @@ bool LiveMachine::awaiting() {
 }
 
 std::shared_ptr<const Snapshot> LiveMachine::read() {
+    try {
+        return tryToRead();
+    } catch (...) {
+        // The changes that led here were taken note of, and not what they led to.
+        monitor_.markChanged();
+        throw;
+    }
+}
+
+std::shared_ptr<const Snapshot> LiveMachine::tryToRead() {
     ClientFacts clients = readClients();
     consultNetworkd(clients);
     NetworkState network = reader_.read(std::chrono::steady_clock::now() + kernelTime);
@@ -109,11 +138,26 @@ std::shared_ptr<const Snapshot> LiveMachine::read() {
     if (surroundings_.realProcesses) {
         watchProcesses(clients);
     }
+    sockets_.reset();
+    if (clients.socketsStandAlone()) {
+        sockets_.emplace();
+        sockets_->sockets = clients.sockets;
+        sockets_->packetLinks = clients.packetLinks;
+    }
     markWireless(surroundings_.roots, network.links);
     std::optional<ServiceProcessor> processor = processor_.read(clients.complaints);
+    std::string hostName = getSystemName();
+    if (hostName.empty()) {
+        clients.complaints.push_back("the system does not tell its name: " +
+                                     std::generic_category().message(errno));
+    }
     removeRepeated(clients.complaints);
     report(clients.complaints);
-    return decide({.hostName = getSystemName(),
+    if (hostName.empty()) {
+        // Whatever is told bears that name.
+        return SnapshotBuilder().build();
+    }
+    return decide({.hostName = std::move(hostName),
                    .links = std::move(network.links),
                    .addresses = std::move(network.addresses),
                    .clients = std::move(clients),
@@ -194,6 +238,11 @@ ClientFacts LiveMachine::readClients() {
 /// Reports what the last reading did not complain about: a lasting trouble is one
 /// line, however often the machine is read.
 void LiveMachine::report(const std::vector<std::string>& complaints) {
+    troubleRest_ = surroundings_.uptime();
+    if (std::all_of(complaints.begin(), complaints.end(),
+                    [&](const std::string& complaint) { return reported_.contains(complaint); })) {
+        troubleRest_ += troublePause;
+    }
     for (const std::string& complaint : complaints) {
         if (!reported_.contains(complaint)) {
             surroundings_.complain(complaint);

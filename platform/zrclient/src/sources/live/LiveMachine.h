@@ -4,6 +4,7 @@
 #include <cstdint>
 #include <functional>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <unordered_set>
@@ -53,9 +54,11 @@ class LiveMachine final : public SnapshotSource {
     [[nodiscard]] std::shared_ptr<const Snapshot> read() override;
 
   private:
+    [[nodiscard]] std::shared_ptr<const Snapshot> tryToRead();
     [[nodiscard]] ClientFacts readClients();
     void consultNetworkd(ClientFacts& clients);
     void watchProcesses(const ClientFacts& clients);
+    [[nodiscard]] bool socketsChanged() const;
     void report(const std::vector<std::string>& complaints);
 
     Surroundings surroundings_;
@@ -63,8 +66,10 @@ class LiveMachine final : public SnapshotSource {
     ChangeMonitor monitor_;
     IpmiReader processor_;
     std::vector<WatchedPlace> places_;
+    std::optional<ClientFacts> sockets_;  // where nothing else tells of who has them
     std::chrono::steady_clock::time_point networkdRest_;  // not to be asked before
-    std::unordered_set<std::string> reported_;
+    std::unordered_set<std::string> reported_;            // of the last reading
+    std::chrono::steady_clock::time_point troubleRest_;   // what is in it waits until then
 };
 
 }  // namespace ZR::Live

@@ -92,6 +92,7 @@ Machine::Machine(MachineFacts facts, std::int64_t now) : facts_(std::move(facts)
     collectLeases(now);
     collectClients();
     collectSockets();
+    collectBootLease();
 }
 
 void Machine::collectLeases(std::int64_t now) {
@@ -102,7 +103,7 @@ void Machine::collectLeases(std::int64_t now) {
         }
         InterfaceView* view = lease.ifindex != 0 ? find(lease.ifindex) : find(lease.interfaceName);
         if (view == nullptr && lease.ifindex == 0) {
-            view = findRenamed(lease, now);
+            view = findByAddress(lease, now);
         } else if (view != nullptr && lease.ifindex != 0 && !lease.interfaceName.empty() &&
                    view->link->name != lease.interfaceName) {
             continue;  // names two links
@@ -181,10 +182,47 @@ InterfaceView* Machine::find(std::string_view name) {
     return found != byName_.end() && views_[*found].link->name == name ? &views_[*found] : nullptr;
 }
 
-InterfaceView* Machine::findRenamed(const Lease& lease, std::int64_t now) {
+InterfaceView* Machine::findByAddress(const Lease& lease, std::int64_t now) {
     const auto found = holders(lease.address);
-    return found.size() == 1 && endsWith(*found.front().address, lease, now) ? found.front().view
-                                                                             : nullptr;
+    const bool meant = found.size() == 1 && (lease.interfaceName.empty() ||
+                                             endsWith(*found.front().address, lease, now));
+    return meant ? found.front().view : nullptr;
+}
+
+void Machine::collectBootLease() {
+    if (!facts_.clients.boot) {
+        return;
+    }
+    InterfaceView* holder = nullptr;
+    const Address* only = nullptr;
+    for (InterfaceView& view : views_) {
+        for (const Address& address : view.addresses) {
+            if (address.family == AF_INET) {
+                if (only != nullptr) {
+                    return;
+                }
+                only = &address;
+                holder = &view;
+            }
+        }
+    }
+    const bool spokenFor = holder == nullptr || !holder->leases.empty() ||
+                           holder->management != nullptr || holder->configuration != nullptr ||
+                           !holder->processes.empty() || holder->socket != nullptr;
+    if (spokenFor || only->validLifetime != Address::infinite) {
+        return;
+    }
+    const BootAnswer& boot = *facts_.clients.boot;
+    bootLease_ = Lease{.client = Client::KernelBoot,
+                       .interfaceName = {},
+                       .ifindex = holder->link->ifindex,
+                       .family = AF_INET,
+                       .address = only->text,
+                       .server = boot.server,
+                       .bootp = boot.bootp,
+                       .expires = Lease::never,
+                       .origin = boot.origin};
+    holder->leases.push_back(&*bootLease_);
 }
 
 std::span<const Machine::Holder> Machine::holders(std::string_view address) {

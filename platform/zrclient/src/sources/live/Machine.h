@@ -50,7 +50,9 @@ struct InterfaceView {
 ///
 /// Clients that name links by name do not learn of a new one. A lease whose link is
 /// gone is that of the one link that has its address, if the address ends when the
-/// lease does, or has no end and the client runs.
+/// lease does, or has no end and the client runs. A client that names no link at all means
+/// the one that has its address. What the kernel was given at the start of the system is
+/// the only IPv4 address of the machine, if that has no end and nobody else speaks for it.
 class Machine {
   public:
     /// `now`: seconds since the epoch.
@@ -78,12 +80,14 @@ class Machine {
     void collectLeases(std::int64_t now);
     void collectClients();
     void collectSockets();
+    void collectBootLease();
     InterfaceView* find(std::uint32_t ifindex);
     InterfaceView* find(std::string_view name);
-    InterfaceView* findRenamed(const Lease& lease, std::int64_t now);
+    InterfaceView* findByAddress(const Lease& lease, std::int64_t now);
     std::span<const Holder> holders(std::string_view address);
 
     MachineFacts facts_;
+    std::optional<Lease> bootLease_;
     std::vector<InterfaceView> views_;  // by ifindex
     std::vector<std::size_t> byName_;   // positions in views_, by name
     std::vector<Holder> byAddress_;     // by text; made when it is first asked for

@@ -8,6 +8,7 @@
 #include <array>
 #include <cerrno>
 #include <cstddef>
+#include <cstdint>
 #include <memory>
 #include <optional>
 #include <span>
@@ -46,10 +47,11 @@ struct KnownManager {
     std::string_view name;  // as /proc/PID/comm has it: at most 15 bytes
     Client client;
 };
-constexpr std::array<KnownManager, 3> knownManagers{{
+constexpr std::array<KnownManager, 4> knownManagers{{
     {"systemd-network", Client::Networkd},  // systemd-networkd, cut off
     {"NetworkManager", Client::NetworkManager},
     {"wickedd-dhcp4", Client::Wicked},
+    {"connmand", Client::Connman},
 }};
 
 struct CloseDirectory {
@@ -123,6 +125,55 @@ std::int32_t numberOf(std::string_view process) {
     return parseNumber<std::int32_t>(process).value_or(0);
 }
 
+/// Takes the next word off a text.
+std::string_view nextWord(std::string_view& text) {
+    text.remove_prefix(std::min(text.find_first_not_of(' '), text.size()));
+    const std::string_view word = text.substr(0, text.find(' '));
+    text.remove_prefix(word.size());
+    return word;
+}
+
+/// Whether a text of the form of /proc/PID/stat is that of a thread of the kernel.
+bool isOfKernel(std::string_view status) {
+    constexpr std::uint32_t kernelThread = 0x0020'0000;  // PF_KTHREAD
+    constexpr int wordsBefore = 6;  // state, parent, group, session, terminal and its group
+    // The name may have blanks and parentheses of its own.
+    const std::size_t afterName = status.rfind(')');
+    if (afterName == std::string_view::npos) {
+        return false;
+    }
+    status.remove_prefix(afterName + 1);
+    for (int word = 0; word < wordsBefore; ++word) {
+        nextWord(status);
+    }
+    return (parseNumber<std::uint32_t>(nextWord(status)).value_or(0) & kernelThread) != 0;
+}
+
+/// The threads of the kernel, most of the processes of many a machine, sorted: none of
+/// them needs to be looked at. They are children of number 2, unless that is a program,
+/// as in a container. Empty when the kernel does not tell (CONFIG_PROC_CHILDREN).
+std::vector<std::int32_t> kernelThreads(int proc) {
+    std::vector<std::int32_t> threads;
+    std::array<char, 4096> buffer{};
+    if (!isOfKernel(readShort(proc, "2/stat", buffer))) {
+        return threads;
+    }
+    const UniqueFd fd{::openat(proc, "2/task/2/children", O_RDONLY | O_CLOEXEC)};
+    if (!fd) {
+        return threads;
+    }
+    std::string text;
+    for (ssize_t got = 0; (got = ::read(fd.get(), buffer.data(), buffer.size())) > 0;) {
+        text.append(buffer.data(), static_cast<std::size_t>(got));
+    }
+    std::string_view rest = text;
+    for (std::string_view word = nextWord(rest); !word.empty(); word = nextWord(rest)) {
+        threads.push_back(numberOf(word));
+    }
+    std::sort(threads.begin(), threads.end());
+    return threads;
+}
+
 void readClient(int proc, std::string_view process, const KnownClient& client,
                 const std::string& ownNamespace, ClientFacts& facts) {
     std::array<char, 4096> buffer{};
@@ -157,6 +208,7 @@ void readProcesses(const Roots& roots, ClientFacts& facts) {
     const int proc = ::dirfd(directory.get());
     // Of this thread: namespaces belong to threads, not to processes.
     const std::string ownNamespace = readNamespace(proc, "thread-self/ns/net");
+    const std::vector<std::int32_t> ofKernel = kernelThreads(proc);
     for (;;) {
         errno = 0;
         const dirent* const entry = ::readdir(directory.get());
@@ -164,7 +216,8 @@ void readProcesses(const Roots& roots, ClientFacts& facts) {
             break;
         }
         const std::string_view process{&entry->d_name[0]};
-        if (process.front() < '1' || process.front() > '9') {
+        if (process.front() < '1' || process.front() > '9' ||
+            std::binary_search(ofKernel.begin(), ofKernel.end(), numberOf(process))) {
             continue;
         }
         std::array<char, 32> buffer{};

@@ -5,8 +5,11 @@
 #include <linux/if_link.h>
 #include <linux/rtnetlink.h>
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
+#include <cstdint>
+#include <optional>
 #include <span>
 #include <system_error>
 #include <utility>
@@ -27,11 +30,9 @@ std::string reasonOf(int error) {
     return std::generic_category().message(error);
 }
 
-/// Whether a whole message lies at the start of so many bytes. libmnl's own check takes
-/// a length from 2 GiB on for a negative one, and so for a short one.
-bool isWhole(const nlmsghdr* message, int left) noexcept {
-    return left >= static_cast<int>(sizeof *message) && message->nlmsg_len >= sizeof *message &&
-           message->nlmsg_len <= static_cast<std::uint32_t>(left);
+/// The errno that the kernel says, which it says negated; EBADMSG where it says none.
+int errorIn(std::optional<std::int32_t> code) {
+    return code && *code < 0 && *code != INT32_MIN ? -*code : EBADMSG;
 }
 
 }  // namespace
@@ -55,6 +56,7 @@ RtnetlinkReader::RtnetlinkReader(std::unique_ptr<NetlinkTransport> transport)
 
 NetworkState RtnetlinkReader::read(Deadline deadline) {
     NetworkState state;
+    held_ = {};
     if (dump(RTM_GETLINK, "links", parseLink, state.links, state, deadline)) {
         // Without links there is nothing that an address could belong to.
         dump(RTM_GETADDR, "addresses", parseAddress, state.addresses, state, deadline);
@@ -68,6 +70,9 @@ bool RtnetlinkReader::dump(std::uint16_t request, const char* what, Parse parse,
     using End = Outcome::End;
     Outcome outcome;
     for (int attempt = 0; attempt < attempts; ++attempt) {
+        if (attempt > 0 && std::chrono::steady_clock::now() >= deadline) {
+            break;
+        }
         facts.clear();
         outcome = dumpOnce(request, parse, facts, deadline);
         if (outcome.end == End::Complete || outcome.end == End::Failed) {
@@ -105,7 +110,7 @@ RtnetlinkReader::Outcome RtnetlinkReader::dumpOnce(std::uint16_t request, Parse 
     // refuses another dump while one is going on: such a socket is not used again.
     open_ = false;
     for (;;) {
-        const Datagram datagram = transport_->receive(buffer_, deadline);
+        const Datagram datagram = transport_->receive(buffer_, deadline + held_);
         if (datagram.error == ENOBUFS) {
             outcome.end = End::Lost;
             outcome.reason = "parts of the answer were lost";
@@ -130,7 +135,7 @@ RtnetlinkReader::Outcome RtnetlinkReader::dumpOnce(std::uint16_t request, Parse 
             open_ = outcome.end == End::Complete || outcome.end == End::Interrupted;
             return outcome;
         }
-        if (std::chrono::steady_clock::now() >= deadline) {
+        if (std::chrono::steady_clock::now() >= deadline + held_) {
             outcome.reason = "no complete answer in time";
             return outcome;
         }
@@ -142,18 +147,20 @@ template <typename Fact, typename Parse>
 bool RtnetlinkReader::take(std::size_t size, std::uint16_t request, Parse parse,
                            std::vector<Fact>& facts, Outcome& outcome) const {
     using End = Outcome::End;
-    int left = static_cast<int>(size);
-    // The buffer comes from operator new and is aligned for any structure.
-    const auto* message = static_cast<const nlmsghdr*>(static_cast<const void*>(buffer_.data()));
-    for (; isWhole(message, left); message = ::mnl_nlmsg_next(message, &left)) {
+    std::span<const std::byte> rest = std::span{buffer_}.first(size);
+    // libmnl's own walk takes a length of 2 GiB and more for a negative one, which fits.
+    while (const auto message = valueAt<nlmsghdr>(rest)) {
+        if (message->nlmsg_len < NLMSG_HDRLEN || message->nlmsg_len > rest.size()) {
+            break;
+        }
+        const auto bytes = rest.first(message->nlmsg_len);
+        rest = rest.subspan(std::min<std::size_t>(NLMSG_ALIGN(bytes.size()), rest.size()));
         if (message->nlmsg_seq != sequence_) {
             continue;  // the rest of an answer that was given up
         }
         if ((message->nlmsg_flags & NLM_F_DUMP_INTR) != 0) {
             outcome.interrupted = true;
         }
-        const std::span bytes{static_cast<const std::byte*>(static_cast<const void*>(message)),
-                              message->nlmsg_len};
         const auto code = valueAt<std::int32_t>(bytes.subspan(NLMSG_HDRLEN));
         switch (message->nlmsg_type) {
             case NLMSG_NOOP:
@@ -166,11 +173,11 @@ bool RtnetlinkReader::take(std::size_t size, std::uint16_t request, Parse parse,
                 if (code && *code == 0) {
                     break;  // an acknowledgement
                 }
-                outcome.reason = "refused: " + reasonOf(code ? -*code : EBADMSG);
+                outcome.reason = "refused: " + reasonOf(errorIn(code));
                 return true;
             case NLMSG_DONE:
                 if (code && *code < 0) {
-                    outcome.reason = "broken off: " + reasonOf(-*code);
+                    outcome.reason = "broken off: " + reasonOf(errorIn(code));
                 } else {
                     outcome.end = outcome.interrupted ? End::Interrupted : End::Complete;
                     outcome.reason = outcome.interrupted ? "changed while they were read" : "";
@@ -188,7 +195,7 @@ bool RtnetlinkReader::take(std::size_t size, std::uint16_t request, Parse parse,
                 }
         }
     }
-    if (left > 0) {
+    if (!rest.empty()) {
         ++outcome.unreadable;
     }
     return false;
@@ -213,7 +220,9 @@ int RtnetlinkReader::ask(std::uint16_t request) {
     } else {
         ::mnl_nlmsg_put_extra_header(message, sizeof(ifaddrmsg));
     }
+    const auto asking = std::chrono::steady_clock::now();
     const int error = transport_->send(std::span{space}.first(message->nlmsg_len));
+    held_ += std::chrono::steady_clock::now() - asking;
     open_ = error == 0;
     return error;
 }

@@ -28,7 +28,11 @@ class RtnetlinkReader {
   public:
     explicit RtnetlinkReader(std::unique_ptr<NetlinkTransport> transport = kernelTransport());
 
-    /// Never throws apart from std::bad_alloc; returns at the deadline at the latest.
+    /// Never throws apart from std::bad_alloc. Waits for answers until the deadline at the
+    /// latest. While somebody holds the kernel's lock of all links, as a namespace of a
+    /// thousand bridges does for seconds when it goes, the kernel keeps whoever asks for
+    /// links in the very call that asks. No deadline ends that, and the answer, which then
+    /// is at hand, is not given up for it; but nothing is asked again after the deadline.
     [[nodiscard]] NetworkState read(Deadline deadline);
 
   private:
@@ -47,6 +51,7 @@ class RtnetlinkReader {
     std::unique_ptr<NetlinkTransport> transport_;
     bool open_ = false;
     std::uint32_t sequence_ = 0;
+    Deadline::duration held_{};  // spent in asking, since the reading began
     std::vector<std::byte> buffer_;
 };
 

@@ -1,10 +1,12 @@
-#include "cimdhcp/Client.h"
+#include "cimdhcp/EmbeddedClient.h"
 
 #include <algorithm>
 #include <utility>
 
 #include "cimdhcp/DisplayText.h"
 #include "cimdhcp/StatusMessage.h"
+#include "zrclient/InstrumentationService.h"
+#include "zrcommon/PlatformUtilities.h"
 
 namespace cimdhcp {
 
@@ -25,8 +27,8 @@ Answer answerOf(const char* operation, cimom::InstancesResult result) {
 
 }  // namespace
 
-Client::Client(const Directories& directories, std::string nameSpace)
-    : nameSpace_(std::move(nameSpace)) {
+EmbeddedClient::EmbeddedClient(const Directories& directories, std::string nameSpace)
+    : Client(std::move(nameSpace)) {
     cimom::Configuration configuration;
     configuration.schemaDirectories = {directories.schema};
     configuration.registrationFiles = registrationFiles(directories.registrations);
@@ -40,31 +42,49 @@ Client::Client(const Directories& directories, std::string nameSpace)
     }
 }
 
-const cimom::ClassRepository& Client::repository() const noexcept {
+const cimom::ClassRepository& EmbeddedClient::repository() const noexcept {
     return manager_->repository();
 }
 
-const std::vector<cimom::Registration>& Client::registrations() const noexcept {
+const std::vector<cimom::Registration>& EmbeddedClient::registrations() const noexcept {
     return manager_->registrations();
 }
 
-cimom::ObjectPath Client::classPath(const std::string& className) const {
-    return {"", nameSpace_, className, {}};
+std::vector<ClassEntry> EmbeddedClient::servedClasses() {
+    return cimdhcp::servedClasses(registrations(), repository());
 }
 
-Answer Client::enumerateNames(const cimom::ObjectPath& path) {
+bool EmbeddedClient::mayServe(std::string_view className) const {
+    return std::any_of(registrations().begin(), registrations().end(),
+                       [className](const cimom::Registration& registration) {
+                           return registration.instance &&
+                                  cimom::sameName(registration.className, className);
+                       });
+}
+
+MachineInterfaces EmbeddedClient::interfaces(const ServedInstances& /*served*/) {
+    const auto snapshot = ZR::InstrumentationService::process().current();
+    const auto remarks = snapshot->remarks();
+    return {interfacesOf(*snapshot), {remarks.begin(), remarks.end()}};
+}
+
+std::optional<std::string> EmbeddedClient::dataDir() const {
+    return ZR::PlatformUtilities::getKestraDataDir();
+}
+
+Answer EmbeddedClient::enumerateNames(const cimom::ObjectPath& path) {
     return answerOf("EnumerateInstanceNames", manager_->enumerateInstanceNames(path));
 }
 
-Answer Client::enumerate(const cimom::ObjectPath& path) {
+Answer EmbeddedClient::enumerate(const cimom::ObjectPath& path) {
     return answerOf("EnumerateInstances", manager_->enumerateInstances(path));
 }
 
-Answer Client::get(const cimom::ObjectPath& path) {
+Answer EmbeddedClient::get(const cimom::ObjectPath& path) {
     return answerOf("GetInstance", manager_->getInstance(path));
 }
 
-Answer Client::modify(const cimom::Instance& instance) {
+Answer EmbeddedClient::modify(const cimom::Instance& instance) {
     cimom::InstanceRequest request;
     request.propertyList.emplace();
     for (const cimom::NamedValue& property : instance.properties) {
@@ -73,26 +93,27 @@ Answer Client::modify(const cimom::Instance& instance) {
     return answerOf("ModifyInstance", manager_->modifyInstance(instance, request));
 }
 
-Answer Client::associatorNames(const cimom::ObjectPath& path,
-                               const cimom::AssociationRequest& request) {
+Answer EmbeddedClient::associatorNames(const cimom::ObjectPath& path,
+                                       const cimom::AssociationRequest& request) {
     return answerOf("AssociatorNames", manager_->associatorNames(path, request));
 }
 
-Answer Client::associators(const cimom::ObjectPath& path,
-                           const cimom::AssociationRequest& request) {
+Answer EmbeddedClient::associators(const cimom::ObjectPath& path,
+                                   const cimom::AssociationRequest& request) {
     return answerOf("Associators", manager_->associators(path, request));
 }
 
-Answer Client::referenceNames(const cimom::ObjectPath& path,
-                              const cimom::AssociationRequest& request) {
+Answer EmbeddedClient::referenceNames(const cimom::ObjectPath& path,
+                                      const cimom::AssociationRequest& request) {
     return answerOf("ReferenceNames", manager_->referenceNames(path, request));
 }
 
-Answer Client::references(const cimom::ObjectPath& path, const cimom::AssociationRequest& request) {
+Answer EmbeddedClient::references(const cimom::ObjectPath& path,
+                                  const cimom::AssociationRequest& request) {
     return answerOf("References", manager_->references(path, request));
 }
 
-Failure Client::failure(const Answer& answer, const cimom::ObjectPath& asked) const {
+Failure EmbeddedClient::failure(const Answer& answer, const cimom::ObjectPath& asked) const {
     // The object manager has no status of its own for a library that it cannot
     // load; it begins such a message with the library's file.
     const bool notLoaded = std::any_of(
