@@ -113,7 +113,9 @@ struct Writer {
         add("max-connections", limits.connections);
         add("max-waiting", limits.waiting);
         add("max-enumerations", limits.sessions.sessions);
+        add("max-result", limits.result);
         add("workers", limits.workers);
+        add("max-stuck", limits.stuck);
         add("io-threads", limits.ioThreads);
         add("request-timeout", limits.request.count());
         add("answer-timeout", limits.answer.count());
@@ -128,6 +130,12 @@ const char* nameOf(cimdhcp::Format format) {
                                              : "table";
 }
 
+const char* nameOf(cimdhcp::ColorMode mode) {
+    return mode == cimdhcp::ColorMode::always  ? "always"
+           : mode == cimdhcp::ColorMode::never ? "never"
+                                               : "auto";
+}
+
 Arguments written(const CommandLine& line) {
     Writer writer;
     addOption(writer.arguments, "tree", line.options.tree);
@@ -137,6 +145,20 @@ Arguments written(const CommandLine& line) {
     addOption(writer.arguments, "schema-dir", line.options.schemaDir);
     addOption(writer.arguments, "registration-dir", line.options.registrationDir);
     addOption(writer.arguments, "provider-dir", line.options.providerDir);
+    for (const std::string& server : line.options.connect) {
+        addOption(writer.arguments, "connect", server);
+    }
+    addOption(writer.arguments, "hosts", line.options.hosts);
+    addOption(writer.arguments, "parallel", std::to_string(line.options.parallel));
+    addOption(writer.arguments, "timeout", std::to_string(line.options.timeout.count()));
+    addOption(writer.arguments, "cacert", line.options.caCertificate);
+    addFlag(writer.arguments, "insecure", line.options.insecure);
+    addOption(writer.arguments, "credentials", line.options.credentials);
+    addFlag(writer.arguments, "no-header", line.options.noHeader);
+    addOption(writer.arguments, "sort", line.options.sort);
+    addFlag(writer.arguments, "count", line.options.count);
+    addFlag(writer.arguments, "time", line.options.time);
+    addOption(writer.arguments, "color", nameOf(line.options.color));
     std::visit(writer, line.command);
     return writer.arguments;
 }

@@ -51,9 +51,9 @@ std::optional<CimHeaders> headersOf(std::string_view text, const cimom::wbem::Li
 }
 
 std::string answerTo(const Call& call, const cimom::wbem::Limits& limits) {
-    cimom::wbem::Operations operations(fuzz::machine(), limits.sessions,
+    cimom::wbem::Operations operations(fuzz::machine(), limits,
                                        [](const cimom::wbem::Modification&) {});
-    auto answer = operations.perform(call, {std::nullopt, "192.0.2.1", true});
+    auto answer = operations.perform(call, {std::nullopt, "192.0.2.1", true, nullptr});
     std::string xml;
     constexpr std::size_t piece = 64;
     while (!answer.ended()) {

@@ -53,6 +53,8 @@ void addRemoteOptions(CLI::App& app, Options& options) {
                    "A WBEM server to ask, https://HOST; may be repeated")
         ->type_name("URL")
         ->expected(1)
+        // Or the parser would take "[::1]" for a list, and the brackets off.
+        ->allow_extra_args(false)
         ->multi_option_policy(CLI::MultiOptionPolicy::TakeAll)
         ->group(serversGroup);
     file("--hosts", options.hosts, "WBEM servers to ask, one per line; -: standard input");

@@ -59,7 +59,15 @@ std::string takeBracketed(std::string_view& rest, const std::string& text) {
         refuse(text, "there is no IPv6 address in the brackets");
     }
     rest.remove_prefix(end + 1);
-    return std::string(inside);
+    std::string address(inside);
+    // A zone's sign is encoded in a URL (RFC 6874), and people write it as it is.
+    constexpr std::string_view encoded = "%25";
+    const std::size_t zone = address.find('%');
+    if (zone != std::string::npos && zone + encoded.size() < address.size() &&
+        address.compare(zone, encoded.size(), encoded) == 0) {
+        address.replace(zone, encoded.size(), "%");
+    }
+    return address;
 }
 
 std::string takeName(std::string_view& rest, const std::string& text) {
@@ -108,14 +116,15 @@ ServerUrl readServerUrl(const std::string& text) {
     std::string_view rest = text;
     ServerUrl url;
     url.given = text;
-    url.encrypted = takeScheme(rest, text);
-    const std::string_view authority = rest.substr(0, rest.find('/'));
-    if (authority.find('@') != std::string_view::npos) {
+    const std::size_t scheme = rest.find("://");
+    const std::size_t authority = scheme == std::string_view::npos ? 0 : scheme + 3;
+    if (rest.substr(0, rest.find('/', authority)).find('@') != std::string_view::npos) {
         // What is refused is not repeated: it holds a password.
         throw Failure(ExitStatus::usage,
                       "a URL cannot hold a user and a password: everybody on this machine could "
                       "read them in the list of processes; put them into a file for --credentials");
     }
+    url.encrypted = takeScheme(rest, text);
     url.host = rest.starts_with('[') ? takeBracketed(rest, text) : takeName(rest, text);
     url.port = url.encrypted ? encryptedPort : plainPort;
     if (rest.starts_with(':')) {

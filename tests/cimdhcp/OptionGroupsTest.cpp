@@ -38,6 +38,13 @@ TEST(OptionGroups, NamesServers) {
     EXPECT_FALSE(Options{}.remote());
 }
 
+TEST(OptionGroups, AnAddressInBracketsKeepsThem) {
+    const std::vector<std::string> servers{"[::1]", "[::1]:5988", "[a,b]"};
+    EXPECT_EQ(line({"--connect", "[::1]", "--connect=[::1]:5988", "--connect=[a,b]", "show"})
+                  .options.connect,
+              servers);
+}
+
 TEST(OptionGroups, SaysHowTheAnswerIsShown) {
     Options options;
     options.noHeader = true;
