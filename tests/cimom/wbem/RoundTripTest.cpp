@@ -5,6 +5,7 @@
 #include "ElementTable.h"
 #include "RandomObjects.h"
 #include "cimom/ObjectPathText.h"
+#include "support/Sanitizers.h"
 #include "wbem/ObjectReader.h"
 #include "wbem/ObjectWriter.h"
 
@@ -13,17 +14,7 @@ namespace cimom::test {
 using ::testing::IsEmpty;
 
 /// Half of a run's objects; sanitizers make each some ten times as dear.
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-constexpr int rounds = 5000;
-#elif defined(__has_feature)
-#if __has_feature(address_sanitizer) || __has_feature(thread_sanitizer)
-constexpr int rounds = 5000;
-#else
-constexpr int rounds = 50'000;
-#endif
-#else
-constexpr int rounds = 50'000;
-#endif
+constexpr int rounds = ZR::Testing::sanitized ? 5000 : 50'000;
 
 wbem::XmlElement parsed(const std::string& xml) {
     const wbem::XmlElement element = wbem::readXml(xml, 64);
