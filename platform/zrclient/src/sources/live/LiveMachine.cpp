@@ -28,8 +28,9 @@ constexpr int errorLevel = 6000;
 // use, after so long: what is in the way may end without a sign.
 constexpr std::chrono::seconds troublePause{1};
 
-// Leaves time for the files, out of the 250 ms that a reading may take.
-constexpr std::chrono::milliseconds kernelTime{150};
+// Ten thousand links take a twentieth of it, but a machine that is busy with other things
+// gives this process its time in small pieces: half an answer would be none.
+constexpr std::chrono::seconds kernelTime{1};
 constexpr std::chrono::milliseconds networkdTime{60};
 
 // A networkd that did not answer is left alone for so long: it would cost every reading
