@@ -1,5 +1,6 @@
 // The WBEM server over loopback: requests per second and their latency with 1, 8
-// and 64 clients, and instances per second of a long result.
+// and 64 clients, on machines of 4 and 1,000 interfaces; the first byte of an answer;
+// and instances per second of a long result.
 #include <arpa/inet.h>
 #include <benchmark/benchmark.h>
 #include <sys/socket.h>
@@ -12,11 +13,13 @@
 #include <chrono>
 #include <cstdlib>
 #include <filesystem>
+#include <fstream>
 #include <memory>
 #include <string>
 #include <string_view>
 #include <system_error>
 #include <thread>
+#include <utility>
 #include <vector>
 
 #include "wbem/Server.h"
@@ -39,11 +42,20 @@ constexpr std::string_view enumerateBody =
     "<IPARAMVALUE NAME=\"ClassName\"><CLASSNAME NAME=\"Many_Thing\"/></IPARAMVALUE></IMETHODCALL>"
     "</SIMPLEREQ></MESSAGE></CIM>";
 
-std::string request(const std::string& method, std::string_view body) {
+constexpr std::string_view endpointsBody =
+    "<?xml version=\"1.0\"?><CIM CIMVERSION=\"2.0\" DTDVERSION=\"2.0\"><MESSAGE ID=\"1\" "
+    "PROTOCOLVERSION=\"1.0\"><SIMPLEREQ><IMETHODCALL NAME=\"EnumerateInstances\">"
+    "<LOCALNAMESPACEPATH><NAMESPACE NAME=\"root\"/><NAMESPACE NAME=\"cimv2\"/>"
+    "</LOCALNAMESPACEPATH><IPARAMVALUE NAME=\"ClassName\"><CLASSNAME "
+    "NAME=\"QVXZR_DHCPProtocolEndpoint\"/></IPARAMVALUE></IMETHODCALL></SIMPLEREQ></MESSAGE>"
+    "</CIM>";
+
+std::string request(const std::string& method, std::string_view body,
+                    const std::string& nameSpace = "root/test") {
     return "POST /cimom HTTP/1.1\r\nHost: localhost\r\nContent-Type: application/xml\r\n"
            "CIMOperation: MethodCall\r\nCIMMethod: " +
-           method + "\r\nCIMObject: root/test\r\nContent-Length: " + std::to_string(body.size()) +
-           "\r\n\r\n" + std::string(body);
+           method + "\r\nCIMObject: " + nameSpace +
+           "\r\nContent-Length: " + std::to_string(body.size()) + "\r\n\r\n" + std::string(body);
 }
 
 /// A client on one connection, which only looks for the end of an answer.
@@ -76,6 +88,7 @@ class Client {
         std::string tail;
         while (true) {
             const ssize_t got = ::recv(fd_, buffer_.data(), buffer_.size(), 0);
+            firstByte_ = total == 0 ? Clock::now() : firstByte_;
             if (got <= 0) {
                 throw std::system_error(errno, std::generic_category(), "recv");
             }
@@ -89,18 +102,53 @@ class Client {
         }
     }
 
+    /// When the last answer began to arrive.
+    [[nodiscard]] Clock::time_point firstByte() const noexcept { return firstByte_; }
+
   private:
     static constexpr std::size_t longAnswer = 60000;
+    Clock::time_point firstByte_;
     int fd_;
     std::vector<char> buffer_;
 };
 
+cimom::Configuration manyThings() {
+    return {
+        {WBEM_TEST_DIR "/schema"}, {WBEM_TEST_DIR "/many.reg"}, {BROKER_PROVIDER_DIR}, "localhost"};
+}
+
+/// The real provider on a machine of so many interfaces. A process has one machine,
+/// so that each benchmark of another one runs in a process of its own.
+cimom::Configuration machine(int interfaces) {
+    const std::filesystem::path directory =
+        std::filesystem::temp_directory_path() / ("server-benchmark-" + std::to_string(::getpid()));
+    std::filesystem::create_directory(directory);
+    std::ofstream tree(directory / "tree.json");
+    tree
+        << R"({"nodes": [{"type": "ComputerSystem", "description": "Computer", "properties": )"
+           R"({"Name": "${HOSTNAME}"}, "children": [{"type": "Network", "description": "Network", )"
+           R"("children": [)";
+    for (int number = 0; number < interfaces; ++number) {
+        tree << (number == 0 ? "" : ",")
+             << R"({"type": "NetworkInterface", "description": "Ethernet interface", )"
+                R"("properties": {"Name": "if)"
+             << number
+             << R"(", "DHCPEnabled": true, "AddressSource": 1, "InterfaceState": 1, )"
+                R"("DHCPServerAddresses": ["192.0.2.1"]}})";
+    }
+    tree << "]}]}]}";
+    tree.close();
+    std::ofstream(directory / "platform.conf")
+        << "INSTRUMENTATION_TREE=" << (directory / "tree.json").string() << "\nLOG_SINK=none\n";
+    ::setenv("ZR_CONFIG", (directory / "platform.conf").c_str(), 1);
+    return {{ZR_SOURCE_DIR "/schema"},
+            {ZR_SOURCE_DIR "/schema/DHCPClientProvider.registration"},
+            {DHCP_PROVIDER_DIR},
+            "localhost"};
+}
+
 struct Served {
-    Served()
-        : manager({{WBEM_TEST_DIR "/schema"},
-                   {WBEM_TEST_DIR "/many.reg"},
-                   {BROKER_PROVIDER_DIR},
-                   "localhost"}) {
+    explicit Served(cimom::Configuration configuration) : manager(std::move(configuration)) {
         cimom::wbem::ServerSettings settings;
         settings.port = 0;
         server = std::make_unique<cimom::wbem::Server>(
@@ -111,12 +159,24 @@ struct Served {
     std::unique_ptr<cimom::wbem::Server> server;
 };
 
-/// Each client asks, one request after the other, for the time of one iteration.
-void getInstances(benchmark::State& state) {
-    const Served served;
-    const std::string bytes = request("GetInstance", getInstanceBody);
-    const auto clients = static_cast<std::size_t>(state.range(0));
-    constexpr std::size_t requestsEach = 200;
+void countQuantiles(benchmark::State& state, std::vector<double> latencies) {
+    std::sort(latencies.begin(), latencies.end());
+    const auto quantile = [&latencies](double part) {
+        return latencies[static_cast<std::size_t>(part *
+                                                  static_cast<double>(latencies.size() - 1))];
+    };
+    state.counters["p50_us"] = quantile(0.5);
+    state.counters["p99_us"] = quantile(0.99);
+    state.counters["max_us"] = latencies.back();
+}
+
+double microseconds(Clock::duration duration) {
+    return std::chrono::duration<double, std::micro>(duration).count();
+}
+
+/// Each client asks, one request after the other.
+void askTogether(benchmark::State& state, const Served& served, const std::string& bytes,
+                 std::size_t clients, std::size_t requestsEach) {
     std::vector<double> latencies;
     for (auto _ : state) {
         std::vector<std::vector<double>> times(clients);
@@ -128,8 +188,7 @@ void getInstances(benchmark::State& state) {
                 for (std::size_t count = 0; count < requestsEach; ++count) {
                     const auto start = Clock::now();
                     client.ask(bytes);
-                    times[index].push_back(
-                        std::chrono::duration<double, std::micro>(Clock::now() - start).count());
+                    times[index].push_back(microseconds(Clock::now() - start));
                 }
             });
         }
@@ -140,19 +199,41 @@ void getInstances(benchmark::State& state) {
             latencies.insert(latencies.end(), each.begin(), each.end());
         }
     }
-    std::sort(latencies.begin(), latencies.end());
-    const auto quantile = [&latencies](double part) {
-        return latencies[static_cast<std::size_t>(part *
-                                                  static_cast<double>(latencies.size() - 1))];
-    };
     state.SetItemsProcessed(static_cast<std::int64_t>(latencies.size()));
-    state.counters["p50_us"] = quantile(0.5);
-    state.counters["p99_us"] = quantile(0.99);
-    state.counters["max_us"] = latencies.back();
+    countQuantiles(state, std::move(latencies));
+}
+
+void getInstances(benchmark::State& state) {
+    const Served served(manyThings());
+    askTogether(state, served, request("GetInstance", getInstanceBody),
+                static_cast<std::size_t>(state.range(0)), 200);
+}
+
+/// The endpoints of a machine: interfaces, clients.
+void enumerateEndpoints(benchmark::State& state) {
+    const auto interfaces = static_cast<int>(state.range(0));
+    const Served served(machine(interfaces));
+    askTogether(state, served, request("EnumerateInstances", endpointsBody, "root/cimv2"),
+                static_cast<std::size_t>(state.range(1)), interfaces > 100 ? 5 : 200);
+}
+
+/// From sending a request to the first byte of its answer, which counts as the time.
+void firstByteOfFourEndpoints(benchmark::State& state) {
+    const Served served(machine(4));
+    const std::string bytes = request("EnumerateInstances", endpointsBody, "root/cimv2");
+    Client client(served.server->port());
+    std::vector<double> latencies;
+    for (auto _ : state) {
+        const auto start = Clock::now();
+        client.ask(bytes);
+        latencies.push_back(microseconds(client.firstByte() - start));
+        state.SetIterationTime(latencies.back() / 1e6);
+    }
+    countQuantiles(state, std::move(latencies));
 }
 
 void enumerateInstances(benchmark::State& state) {
-    const Served served;
+    const Served served(manyThings());
     const auto count = static_cast<unsigned>(state.range(0));
     ::setenv("MANY_THINGS", std::to_string(count).c_str(), 1);
     const std::string bytes = request("EnumerateInstances", enumerateBody);
@@ -167,6 +248,12 @@ void enumerateInstances(benchmark::State& state) {
 }
 
 BENCHMARK(getInstances)->Arg(1)->Arg(8)->Arg(64)->UseRealTime()->Unit(benchmark::kMillisecond);
+BENCHMARK(firstByteOfFourEndpoints)->UseManualTime()->Unit(benchmark::kMicrosecond);
+BENCHMARK(enumerateEndpoints)
+    ->ArgsProduct({{4, 1000}, {1, 8, 64}})
+    ->ArgNames({"interfaces", "clients"})
+    ->UseRealTime()
+    ->Unit(benchmark::kMillisecond);
 BENCHMARK(enumerateInstances)->Arg(100000)->UseRealTime()->Unit(benchmark::kMillisecond);
 
 }  // namespace

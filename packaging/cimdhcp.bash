@@ -2,17 +2,24 @@
 
 _cimdhcp() {
     local word=${COMP_WORDS[COMP_CWORD]} before=${COMP_WORDS[COMP_CWORD - 1]}
-    local options='--tree --data-dir --namespace --format --schema-dir --registration-dir
-        --provider-dir --version --help'
+    local options='--tree --data-dir --namespace --format --connect --hosts --parallel --timeout
+        --credentials --cacert --insecure --no-header --sort --count --time --color --schema-dir
+        --registration-dir --provider-dir --version --help'
     local commands='show rename graph tree check classes names instances get modify associators
         references serve user'
+    # What the program is asked for completions with: the same servers, if there are any.
+    local asked=("${COMP_WORDS[0]}")
     local command='' position=0 index
     COMPREPLY=()
 
     # The command, and how many words stand behind it already.
     for ((index = 1; index < COMP_CWORD; ++index)); do
         case ${COMP_WORDS[index]} in
-            --tree | --data-dir | --namespace | --format | --*-dir | --*-class | --role | --result-role | --listen | --tls-* | --users)
+            --connect | --credentials | --cacert)
+                asked+=("${COMP_WORDS[index]}" "${COMP_WORDS[index + 1]}")
+                ((++index))
+                ;;
+            --tree | --data-dir | --namespace | --format | --hosts | --parallel | --timeout | --sort | --color | --*-dir | --*-class | --role | --result-role | --listen | --tls-* | --users | --max-* | --workers | --io-threads | --*-timeout)
                 ((++index))
                 ;;
             -*) ;;
@@ -25,14 +32,34 @@ _cimdhcp() {
                 ;;
         esac
     done
+    # A server that is slow must not make the shell wait.
+    [[ ${asked[*]} == *--connect* ]] && asked+=(--timeout 2)
 
     case $before in
         --format)
             mapfile -t COMPREPLY < <(compgen -W 'table mof json' -- "$word")
             return
             ;;
-        --tls-cert | --tls-key | --users)
+        --color)
+            mapfile -t COMPREPLY < <(compgen -W 'auto always never' -- "$word")
+            return
+            ;;
+        --tls-cert | --tls-key | --users | --hosts | --credentials | --cacert)
             mapfile -t COMPREPLY < <(compgen -f -- "$word")
+            return
+            ;;
+        --connect)
+            mapfile -t COMPREPLY < <(compgen -A hostname -- "$word")
+            return
+            ;;
+        --sort)
+            case $command in
+                show) mapfile -t COMPREPLY < <(compgen -W 'system interface dhcp state address
+                    servers configuration-name' -- "$word") ;;
+                classes) mapfile -t COMPREPLY < <(compgen -W 'class superclass kind provider' \
+                    -- "$word") ;;
+                *) mapfile -t COMPREPLY < <(compgen -W 'PATH' -- "$word") ;;
+            esac
             return
             ;;
         --tree)
@@ -46,7 +73,9 @@ _cimdhcp() {
         --assoc-class | --result-class)
             command=names position=0
             ;;
-        --namespace | --role | --result-role) return ;;
+        --namespace | --role | --result-role | --parallel | --timeout | --listen | --max-* | --workers | --io-threads | --*-timeout)
+            return
+            ;;
     esac
 
     if [[ $word == -* ]]; then
@@ -54,7 +83,10 @@ _cimdhcp() {
             rename) options+=' --create' ;;
             graph) options+=' --svg' ;;
             tree) options+=' --explain' ;;
-            serve) options+=' --listen --tls-cert --tls-key --users --read-only' ;;
+            serve) options+=' --listen --tls-cert --tls-key --users --read-only --max-header-line
+                --max-headers --max-body --max-depth --max-connections --max-waiting
+                --max-enumerations --workers --io-threads --request-timeout --answer-timeout
+                --enumeration-timeout --max-enumeration-timeout' ;;
             user) options+=' --users --modify' ;;
             associators) options+=' --names --assoc-class --result-class --role --result-role' ;;
             references) options+=' --names --result-class --role' ;;
@@ -67,11 +99,11 @@ _cimdhcp() {
         user:0) mapfile -t COMPREPLY < <(compgen -W add -- "$word") ;;
         names:0 | instances:0)
             mapfile -t COMPREPLY < <(compgen -W \
-                "$("${COMP_WORDS[0]}" classes 2>/dev/null | awk 'NR > 1 { print $1 }')" -- "$word")
+                "$("${asked[@]}" classes 2>/dev/null | awk 'NR > 1 { print $1 }')" -- "$word")
             ;;
         rename:0)
             mapfile -t COMPREPLY < <(compgen -W \
-                "$("${COMP_WORDS[0]}" names QVXZR_DHCPSettingData 2>/dev/null |
+                "$("${asked[@]}" names QVXZR_DHCPSettingData 2>/dev/null |
                     sed -n 's/.*InstanceID="[^%]*%\(.*\)"$/\1/p')" -- "$word")
             ;;
     esac

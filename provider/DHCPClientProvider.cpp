@@ -17,6 +17,7 @@
 #include "CMPI/CMPISAPSAPDependency.h"
 #include "include/TracePoint.h"
 #include "providerutilities/ProviderUtilities.h"
+#include "zrclient/OneMoment.h"
 
 namespace ZR::DHCPClientProvider {
 
@@ -124,6 +125,7 @@ constexpr std::array servedClasses{
 /// the status stays as it was: the failure shows in the log alone.
 template <typename Operation>
 CMPIStatus serve(const TracePoint& at, const CMPIObjectPath* path, Operation operation) {
+    const OneMoment moment;
     markProviderEntry(loggerDHCPClientProvider, at.source.file.data(), at.function.data(), at.line);
     const unsigned short classId = ProviderUtilities::getClassId(path);
     traceVariable(at, "classId", classId);
@@ -286,6 +288,7 @@ const AssociationClass* findAssociation(unsigned short classId) {
 /// names and an error for instances, and only the latter logs failures.
 CMPIStatus serveAssociators(const Request& request, const char* assocClass, const char* resultClass,
                             AssociatorColumn column, bool names) {
+    const OneMoment moment;
     const TracePoint& at = request.at;
     markProviderEntry(loggerDHCPClientProvider, at.source.file.data(), at.function.data(), at.line);
     CMPIStatus status{CMPI_RC_OK, nullptr};
@@ -334,6 +337,7 @@ CMPIStatus serveAssociators(const Request& request, const char* assocClass, cons
 /// References and their names: of the one association class that is named exactly.
 CMPIStatus serveReferences(const Request& request, const char* resultClass, ReferenceColumn column,
                            bool names) {
+    const OneMoment moment;
     const TracePoint& at = request.at;
     markProviderEntry(loggerDHCPClientProvider, at.source.file.data(), at.function.data(), at.line);
     const unsigned short classId = ProviderUtilities::getClassId(resultClass);

@@ -12,9 +12,10 @@
 #include <utility>
 #include <variant>
 
-#include "cimdhcp/Client.h"
 #include "cimdhcp/DisplayText.h"
+#include "cimdhcp/EmbeddedClient.h"
 #include "cimdhcp/Failure.h"
+#include "cimdhcp/HiddenClients.h"
 #include "cimdhcp/JsonFormat.h"
 #include "cimdhcp/PlatformSetup.h"
 #include "zrclient/InstrumentationService.h"
@@ -167,6 +168,23 @@ class Examination {
                     "run as root, or add the user to the group that may read it");
             }
         }
+        lookAtClients();
+    }
+
+    /// Processes of DHCP clients that this user may not look into.
+    void lookAtClients() {
+        const HiddenClients hidden = findHiddenClients();
+        if (hidden.otherUsersHidden) {
+            add(Verdict::notable, "live source",
+                "/proc hides the processes of other users: DHCP clients among them are not seen",
+                "run as root, or add the user to the group that /proc is mounted for (gid=)");
+        }
+        for (const std::string& process : hidden.processes) {
+            add(Verdict::notable, "live source",
+                "the network of " + printable(process) +
+                    " is hidden from this user: what it does is not seen",
+                "run as root, or with CAP_SYS_PTRACE; for the service see docs/server.md");
+        }
     }
 
     std::optional<Directories> lookAtInstallation() {
@@ -310,7 +328,7 @@ class Examination {
     const Options& options_;
     const std::vector<Directories>& installations_;
     std::vector<Finding> findings_;
-    std::optional<Client> client_;
+    std::optional<EmbeddedClient> client_;
     std::size_t dhcpInterfaces_ = 0;
 };
 

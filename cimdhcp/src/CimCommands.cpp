@@ -44,15 +44,15 @@ Request carryOut(const InstancesCommand& command, Client& client) {
 
 Request carryOut(const GetCommand& command, Client& client) {
     const cimom::ObjectPath path =
-        readPathArgument(command.path, client.nameSpace(), client.repository());
+        readPathArgument(command.path, client.nameSpace(), client.classes());
     return {path, client.get(path)};
 }
 
 Request carryOut(const ModifyCommand& command, Client& client) {
     cimom::Instance instance;
-    instance.path = readPathArgument(command.path, client.nameSpace(), client.repository());
+    instance.path = readPathArgument(command.path, client.nameSpace(), client.classes());
     const cimom::ClassDeclaration* const declaration =
-        client.repository().find(instance.path.className);
+        client.classes().find(instance.path.className);
     for (const std::string& assignment : command.assignments) {
         const auto [name, value] = splitAssignment(assignment);
         if (instance.property(name) != nullptr) {
@@ -74,7 +74,7 @@ Request carryOut(const ModifyCommand& command, Client& client) {
 
 Request carryOut(const AssociatorsCommand& command, Client& client) {
     const cimom::ObjectPath path =
-        readPathArgument(command.path, client.nameSpace(), client.repository());
+        readPathArgument(command.path, client.nameSpace(), client.classes());
     cimom::AssociationRequest request;
     request.assocClass = command.assocClass;
     request.resultClass = command.resultClass;
@@ -86,7 +86,7 @@ Request carryOut(const AssociatorsCommand& command, Client& client) {
 
 Request carryOut(const ReferencesCommand& command, Client& client) {
     const cimom::ObjectPath path =
-        readPathArgument(command.path, client.nameSpace(), client.repository());
+        readPathArgument(command.path, client.nameSpace(), client.classes());
     cimom::AssociationRequest request;
     request.resultClass = command.resultClass;
     request.role = command.role;

@@ -3,7 +3,6 @@
 #include <nlohmann/json.hpp>
 
 #include "cimdhcp/JsonFormat.h"
-#include "cimdhcp/Table.h"
 
 namespace cimdhcp {
 
@@ -11,6 +10,14 @@ namespace {
 
 const char* kind(const ClassEntry& entry) {
     return entry.association ? "association" : "element";
+}
+
+std::string cell(const std::string& text) {
+    return text.empty() ? "-" : text;
+}
+
+nlohmann::ordered_json json(const std::string& text) {
+    return text.empty() ? nlohmann::ordered_json(nullptr) : nlohmann::ordered_json(text);
 }
 
 }  // namespace
@@ -29,26 +36,27 @@ std::vector<ClassEntry> servedClasses(const std::vector<cimom::Registration>& re
     return classes;
 }
 
-std::string classTable(const std::vector<ClassEntry>& classes, std::optional<std::size_t> width) {
-    Table table({"CLASS", "SUPERCLASS", "KIND", "PROVIDER"});
-    for (const ClassEntry& entry : classes) {
-        table.add({entry.name, entry.superclass.empty() ? "-" : entry.superclass, kind(entry),
-                   entry.provider});
-    }
-    return table.text(width);
+const std::vector<Column<ClassEntry>>& classColumns() {
+    static const std::vector<Column<ClassEntry>> columns{
+        {"CLASS", [](const ClassEntry& entry) { return entry.name; }},
+        {"SUPERCLASS", [](const ClassEntry& entry) { return cell(entry.superclass); }},
+        {"KIND", [](const ClassEntry& entry) { return std::string(kind(entry)); }},
+        {"PROVIDER", [](const ClassEntry& entry) { return cell(entry.provider); }}};
+    return columns;
+}
+
+std::string classTable(const std::vector<ClassEntry>& classes, std::optional<std::size_t> width,
+                       const Style& style) {
+    return tableOf(classColumns(), classes).text(width, style);
 }
 
 std::string classJson(const std::vector<ClassEntry>& classes) {
     auto list = nlohmann::ordered_json::array();
     for (const ClassEntry& entry : classes) {
-        nlohmann::ordered_json superclass;
-        if (!entry.superclass.empty()) {
-            superclass = entry.superclass;
-        }
         list.push_back({{"class", entry.name},
-                        {"superclass", std::move(superclass)},
+                        {"superclass", json(entry.superclass)},
                         {"kind", kind(entry)},
-                        {"provider", entry.provider},
+                        {"provider", json(entry.provider)},
                         {"namespaces", entry.nameSpaces}});
     }
     return jsonText({{"classes", std::move(list)}});

@@ -1,6 +1,7 @@
 #include "cimdhcp/CommandLine.h"
 
 #include <CLI/CLI.hpp>
+#include <algorithm>
 #include <map>
 #include <memory>
 #include <stdexcept>
@@ -8,6 +9,7 @@
 #include "cimdhcp/DisplayText.h"
 #include "cimdhcp/Failure.h"
 #include "cimdhcp/HelpFormatter.h"
+#include "cimdhcp/OptionGroups.h"
 
 namespace cimdhcp {
 
@@ -16,7 +18,8 @@ namespace {
 constexpr const char* description =
     "Shows and changes how the network interfaces of this machine use DHCP.\n"
     "Everything is asked of the CIM provider of the machine's DHCP clients, in this\n"
-    "process: no object manager has to be installed or running.";
+    "process: no object manager has to be installed or running. With --connect or\n"
+    "--hosts, the WBEM servers of other machines are asked.";
 
 constexpr const char* pathHelp =
     "PATH names an instance as CLASS.KEY=\"VALUE\"[,KEY=\"VALUE\"...]; a namespace and a\n"
@@ -33,13 +36,18 @@ Examples:
   cimdhcp --tree machine.json show
   cimdhcp serve
   cimdhcp user add --users users --modify admin
+  cimdhcp --connect https://host.example show
+  cimdhcp --hosts hosts --credentials credentials show
 
 Exit status:
   0  done
   1  the answer is another CIM status than OK (its name is on standard error), or
      a rename was not possible
   2  the command line cannot be understood
-  3  the provider or a file cannot be loaded, or the output cannot be written
+  3  the provider or a file cannot be loaded, a server not be reached or
+     understood, or the output not be written
+  4  some of several servers have failed
+  130  interrupted while servers were asked
 
 Schema, registrations and providers are those that are installed with the program,
 unless an advanced option or one of the environment variables CIMDHCP_SCHEMA_DIR,
@@ -54,6 +62,38 @@ constexpr const char* associationGroup = "Associations";
 constexpr const char* serverGroup = "The WBEM server";
 constexpr const char* limitGroup = "Limits of what a client may cost; none can be switched off";
 constexpr const char* advancedGroup = "Advanced options";
+
+/// Whether an option of the program or of any command takes a value.
+bool takesValue(const CLI::App& app, const std::string& option) {
+    const CLI::Option* const found = app.get_option_no_throw(option);
+    if (found != nullptr && found->get_items_expected_max() > 0) {
+        return true;
+    }
+    const auto commands = app.get_subcommands([](const CLI::App*) { return true; });
+    return std::any_of(commands.begin(), commands.end(),
+                       [&](const CLI::App* command) { return takesValue(*command, option); });
+}
+
+/// "--option=" as an option and an empty value, which the parser would look for in the
+/// next argument.
+std::vector<std::string> withEmptyValues(const CLI::App& app,
+                                         const std::vector<std::string>& arguments) {
+    std::vector<std::string> result;
+    bool operandsOnly = false;
+    for (const std::string& argument : arguments) {
+        operandsOnly = operandsOnly || argument == "--";
+        const bool noValue =
+            argument.starts_with("--") && argument.find('=') + 1 == argument.size();
+        const std::string option = argument.substr(0, argument.find('='));
+        if (!operandsOnly && noValue && takesValue(app, option)) {
+            result.push_back(option);
+            result.emplace_back();
+        } else {
+            result.push_back(argument);
+        }
+    }
+    return result;
+}
 
 /// The options of a command line while they are being read.
 class Reader {
@@ -78,7 +118,8 @@ class Reader {
     std::variant<CommandLine, Information> read(const std::vector<std::string>& arguments) {
         try {
             // The parser takes them from the end.
-            app_.parse(std::vector<std::string>(arguments.rbegin(), arguments.rend()));
+            const std::vector<std::string> whole = withEmptyValues(app_, arguments);
+            app_.parse(std::vector<std::string>(whole.rbegin(), whole.rend()));
         } catch (const CLI::CallForHelp&) {
             return Information{app_.help()};
         } catch (const CLI::CallForVersion& version) {
@@ -131,6 +172,8 @@ class Reader {
                            ? std::string()
                            : "there is no format \"" + name + "\", only table, mof and json";
             });
+        addRemoteOptions(app_, line_.options);
+        addOutputOptions(app_, line_.options);
         app_.add_option("--schema-dir", line_.options.schemaDir, "Directory of the *.mof files")
             ->type_name("DIR")
             ->envname("CIMDHCP_SCHEMA_DIR")
@@ -274,7 +317,10 @@ class Reader {
         number("--max-connections", limits.connections, "Open connections (512)");
         number("--max-waiting", limits.waiting, "Requests that wait for a worker (256)");
         number("--max-enumerations", limits.sessions.sessions, "Open enumerations (64)");
+        number("--max-result", limits.result, "Bytes of a result (1073741824)");
         number("--workers", limits.workers, "Operations at the same time (4)");
+        number("--max-stuck", limits.stuck,
+               "Further workers, for those whose operation does not return (16)");
         number("--io-threads", limits.ioThreads, "Threads that read and send (2)");
         seconds("--request-timeout", limits.request,
                 "For a request to arrive, and again for its operation (30)");
@@ -321,6 +367,7 @@ class Reader {
                 throw Failure(ExitStatus::usage, std::string("--") + error.what());
             }
         }
+        checkOptionsFor(line_);
         if (options.format == Format::mof && !hasMofForm()) {
             throw Failure(ExitStatus::usage,
                           "this command has no MOF output; use --format table or json");

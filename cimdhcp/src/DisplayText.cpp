@@ -25,6 +25,9 @@ class Widths {
 
     /// Columns of a character, below 0 when it cannot be printed.
     [[nodiscard]] int of(wchar_t unit) const {
+        if (unit == L'\0') {
+            return -1;  // wcwidth() takes it for the end of a text, of no width
+        }
         if (locale_ == nullptr) {
             return unit < L' ' || (unit >= 0x7F && unit <= 0x9F) ? -1 : 1;
         }
@@ -113,7 +116,9 @@ std::string cutToWidth(const std::string& text, std::size_t width) {
     if (width < 2) {
         return "…";
     }
-    return ZR::make_string(std::wstring_view(wide).substr(0, fitting(wide, width - 1))) + "…";
+    const std::wstring_view beginning = std::wstring_view(wide).substr(0, fitting(wide, width - 1));
+    // The first character alone may be wider than the room before the dots.
+    return columns(beginning) < width ? ZR::make_string(beginning) + "…" : "…";
 }
 
 std::vector<std::string> wrapToWidth(std::string_view text, std::size_t width) {

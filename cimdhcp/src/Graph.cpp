@@ -147,7 +147,7 @@ Graph connect(const std::vector<cimom::ObjectPath>& elements,
 Graph graphOfMachine(Client& client) {
     std::vector<cimom::ObjectPath> elements;
     std::vector<cimom::ObjectPath> associations;
-    for (const ClassEntry& entry : servedClasses(client.registrations(), client.repository())) {
+    for (const ClassEntry& entry : client.servedClasses()) {
         std::vector<cimom::ObjectPath>& paths = entry.association ? associations : elements;
         for (cimom::ObjectPath& path : pathsOf(client, entry.name)) {
             paths.push_back(std::move(path));

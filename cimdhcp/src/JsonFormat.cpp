@@ -6,6 +6,7 @@
 #include <type_traits>
 #include <variant>
 
+#include "cimdhcp/StatusMessage.h"
 #include "cimom/ObjectPathText.h"
 #include "zrcommon/Strings.h"
 
@@ -80,13 +81,13 @@ std::string asJson(const Answer& answer) {
     for (const auto& instance : answer.instances) {
         instances.push_back(instance ? instanceJson(*instance) : Json(nullptr));
     }
-    return jsonText(Json{{"operation", answer.operation},
-                         {"status",
-                          {{"code", static_cast<int>(answer.status.code)},
-                           {"name", cimom::statusName(answer.status.code)}}},
-                         {"returnDone", answer.returnDoneCalls},
-                         {"paths", std::move(paths)},
-                         {"instances", std::move(instances)}});
+    return jsonText(Json{
+        {"operation", answer.operation},
+        {"status",
+         {{"code", static_cast<int>(answer.status.code)}, {"name", statusNameOf(answer.status)}}},
+        {"returnDone", answer.returnDoneCalls ? Json(*answer.returnDoneCalls) : Json(nullptr)},
+        {"paths", std::move(paths)},
+        {"instances", std::move(instances)}});
 }
 
 std::string jsonText(const nlohmann::ordered_json& document) {

@@ -3,9 +3,12 @@
 #include <algorithm>
 #include <cstdint>
 #include <string_view>
+#include <unordered_map>
+#include <unordered_set>
 #include <utility>
 #include <variant>
 
+#include "cimdhcp/Client.h"
 #include "cimdhcp/InstanceMeanings.h"
 
 namespace cimdhcp {
@@ -73,43 +76,11 @@ std::string words(const cimom::Instance& instance, const cimom::ClassDeclaration
 }
 
 /// The state of the client; while it has none, whether it is enabled.
-std::string stateOf(const cimom::Instance& endpoint, const cimom::ClassRepository& repository) {
-    const cimom::ClassDeclaration* const declaration = repository.find(endpoint.path.className);
+std::string stateOf(const cimom::Instance& endpoint, const ClassLookup& classes) {
+    const cimom::ClassDeclaration* const declaration = classes.find(endpoint.path.className);
     const cimom::Value* const client = endpoint.property("ClientState");
     const bool told = client != nullptr && !client->isNull() && !isZero(*client);
     return words(endpoint, declaration, told ? "ClientState" : "EnabledState");
-}
-
-bool isServed(const Client& client, std::string_view className) {
-    return std::any_of(client.registrations().begin(), client.registrations().end(),
-                       [className](const cimom::Registration& registration) {
-                           return registration.instance &&
-                                  cimom::sameName(registration.className, className);
-                       });
-}
-
-/// None for a class that is not registered (of which an enumeration is empty, as of
-/// any class that is known), or that its provider refuses.
-std::optional<std::vector<cimom::Instance>> instancesOf(Client& client, const char* className) {
-    if (!isServed(client, className)) {
-        return std::nullopt;
-    }
-    const cimom::ObjectPath path = client.classPath(className);
-    Answer answer = client.enumerate(path);
-    if (answer.status.code == CMPI_RC_ERR_INVALID_CLASS ||
-        answer.status.code == CMPI_RC_ERR_NOT_SUPPORTED) {
-        return std::nullopt;
-    }
-    if (!answer.status.ok()) {
-        throw client.failure(answer, path);
-    }
-    std::vector<cimom::Instance> instances;
-    for (auto& instance : answer.instances) {
-        if (instance) {
-            instances.push_back(*std::move(instance));
-        }
-    }
-    return instances;
 }
 
 }  // namespace
@@ -131,40 +102,97 @@ std::vector<InterfaceOverview> interfacesOf(const ZR::Snapshot& snapshot) {
     return interfaces;
 }
 
+std::vector<InterfaceOverview> interfacesOf(const std::vector<cimom::Instance>& settings,
+                                            const std::vector<cimom::Instance>& ipEndpoints,
+                                            const std::vector<std::string>& processors) {
+    const std::unordered_set<std::string> processorNames(processors.begin(), processors.end());
+    std::unordered_map<std::string, std::string> addresses;  // by "SYSTEM%NAME"
+    for (const cimom::Instance& endpoint : ipEndpoints) {
+        const bool processor = processorNames.contains(text(endpoint, "SystemName"));
+        addresses[std::string(processor ? serviceProcessor : host) + '%' + text(endpoint, "Name")] =
+            text(endpoint, "IPv4Address");
+    }
+    std::vector<InterfaceOverview> interfaces;
+    for (const cimom::Instance& setting : settings) {
+        const std::string id = text(setting, "InstanceID");
+        // No system's name has the sign, an interface's may.
+        const std::size_t sign = id.find('%');
+        if (sign == std::string::npos) {
+            continue;
+        }
+        InterfaceOverview overview;
+        overview.system = id.substr(0, sign);
+        overview.name = id.substr(sign + 1);
+        if (const auto found = addresses.find(id); found != addresses.end()) {
+            overview.address = found->second;
+        }
+        interfaces.push_back(std::move(overview));
+    }
+    return interfaces;
+}
+
+std::optional<std::vector<cimom::Instance>> instancesOf(Client& client, const char* className) {
+    // An enumeration of a class that is known and not registered is empty.
+    if (!client.mayServe(className)) {
+        return std::nullopt;
+    }
+    const cimom::ObjectPath path = client.classPath(className);
+    Answer answer = client.enumerate(path);
+    if (answer.status.code == CMPI_RC_ERR_INVALID_CLASS ||
+        answer.status.code == CMPI_RC_ERR_NOT_SUPPORTED) {
+        return std::nullopt;
+    }
+    if (!answer.status.ok()) {
+        throw client.failure(answer, path);
+    }
+    std::vector<cimom::Instance> instances;
+    for (auto& instance : answer.instances) {
+        if (instance) {
+            instances.push_back(*std::move(instance));
+        }
+    }
+    return instances;
+}
+
 ServedInstances askProvider(Client& client) {
     return {instancesOf(client, "QVXZR_DHCPProtocolEndpoint"),
             instancesOf(client, "QVXZR_DHCPRemoteServiceAccessPoint"),
             instancesOf(client, "QVXZR_DHCPSettingData")};
 }
 
-void addServed(const ServedInstances& served, const cimom::ClassRepository& repository,
+void addServed(const ServedInstances& served, const ClassLookup& classes,
                std::vector<InterfaceOverview>& interfaces) {
+    // By "SYSTEM%NAME". No system's name has the sign.
+    std::unordered_map<std::string, const cimom::Instance*> endpoints;
+    std::unordered_map<std::string, std::vector<std::string>> servers;
+    std::unordered_map<std::string, const cimom::Instance*> settings;
+    const std::vector<cimom::Instance> nothing;
+    for (const cimom::Instance& endpoint : served.endpoints ? *served.endpoints : nothing) {
+        endpoints[systemOf(endpoint) + '%' + text(endpoint, "Name")] = &endpoint;
+    }
+    for (const cimom::Instance& point : served.accessPoints ? *served.accessPoints : nothing) {
+        // Its name is the interface's with the kind of address behind it.
+        const std::string name = text(point, "Name");
+        servers[systemOf(point) + '%' + name.substr(0, name.rfind('_'))].push_back(
+            text(point, "AccessInfo"));
+    }
+    for (const cimom::Instance& setting : served.settings ? *served.settings : nothing) {
+        settings[text(setting, "InstanceID")] = &setting;
+    }
     for (InterfaceOverview& interface : interfaces) {
-        if (served.endpoints) {
-            interface.dhcp = false;
-            for (const cimom::Instance& endpoint : *served.endpoints) {
-                if (systemOf(endpoint) == interface.system &&
-                    text(endpoint, "Name") == interface.name) {
-                    interface.dhcp = true;
-                    interface.state = stateOf(endpoint, repository);
-                }
-            }
-        }
-        for (const cimom::Instance& point :
-             served.accessPoints.value_or(std::vector<cimom::Instance>())) {
-            // Its name is the interface's with the kind of address behind it.
-            const std::string name = text(point, "Name");
-            if (systemOf(point) == interface.system &&
-                name.substr(0, name.rfind('_')) == interface.name) {
-                interface.servers.push_back(text(point, "AccessInfo"));
-            }
-        }
         const std::string id = interface.system + '%' + interface.name;
-        for (const cimom::Instance& setting :
-             served.settings.value_or(std::vector<cimom::Instance>())) {
-            if (text(setting, "InstanceID") == id) {
-                interface.configurationName = text(setting, "ConfigurationName");
+        if (served.endpoints) {
+            const auto endpoint = endpoints.find(id);
+            interface.dhcp = endpoint != endpoints.end();
+            if (*interface.dhcp) {
+                interface.state = stateOf(*endpoint->second, classes);
             }
+        }
+        if (const auto found = servers.find(id); found != servers.end()) {
+            interface.servers = found->second;
+        }
+        if (const auto found = settings.find(id); found != settings.end()) {
+            interface.configurationName = text(*found->second, "ConfigurationName");
         }
     }
 }

@@ -29,7 +29,7 @@ std::string declaration(const std::string& className, const std::vector<cimom::N
 
 }  // namespace
 
-std::string asMof(const Answer& answer, const cimom::ClassRepository& repository) {
+std::string asMof(const Answer& answer, const ClassLookup& classes) {
     std::string text;
     const auto add = [&](const std::string& part) { text += (text.empty() ? "" : "\n") + part; };
     for (const auto& path : answer.paths) {
@@ -42,7 +42,7 @@ std::string asMof(const Answer& answer, const cimom::ClassRepository& repository
             continue;
         }
         const std::string& className = instance->path.className;
-        add(declaration(className, instance->properties, repository.find(className)));
+        add(declaration(className, instance->properties, classes.find(className)));
     }
     return text;
 }

@@ -5,7 +5,6 @@
 
 #include "cimdhcp/DisplayText.h"
 #include "cimdhcp/JsonFormat.h"
-#include "cimdhcp/Table.h"
 
 namespace cimdhcp {
 
@@ -36,39 +35,36 @@ nlohmann::ordered_json json(const std::string& text) {
 
 }  // namespace
 
+const std::vector<Column<InterfaceOverview>>& overviewColumns() {
+    using Row = InterfaceOverview;
+    static const std::vector<Column<Row>> columns{
+        {"SYSTEM", [](const Row& row) { return row.system; }},
+        {"INTERFACE", [](const Row& row) { return cell(row.name); }},
+        {"DHCP", [](const Row& row) { return cell(row.dhcp); }},
+        {"STATE", [](const Row& row) { return cell(row.state); }},
+        {"ADDRESS", [](const Row& row) { return cell(row.address); }},
+        {"SERVERS", [](const Row& row) { return cell(row.servers); }},
+        {"CONFIGURATION NAME", [](const Row& row) { return cell(row.configurationName); }}};
+    return columns;
+}
+
 std::string overviewTable(const std::vector<InterfaceOverview>& interfaces,
-                          std::optional<std::size_t> width) {
+                          std::optional<std::size_t> width, const Style& style) {
     if (interfaces.empty()) {
-        return "This machine has no network interfaces.\n";
+        return style.header ? "This machine has no network interfaces.\n" : "";
     }
     const bool oneSystem =
         std::all_of(interfaces.begin(), interfaces.end(),
                     [](const InterfaceOverview& each) { return each.system == "Computer"; });
-    std::vector<std::string> headings;
-    if (!oneSystem) {
-        headings.emplace_back("SYSTEM");
-    }
-    for (const char* heading :
-         {"INTERFACE", "DHCP", "STATE", "ADDRESS", "SERVERS", "CONFIGURATION NAME"}) {
-        headings.emplace_back(heading);
-    }
-    Table table(std::move(headings));
-    for (const InterfaceOverview& each : interfaces) {
-        std::vector<std::string> row;
-        if (!oneSystem) {
-            row.push_back(each.system);
-        }
-        for (std::string text :
-             {cell(each.name), cell(each.dhcp), cell(each.state), cell(each.address),
-              cell(each.servers), cell(each.configurationName)}) {
-            row.push_back(std::move(text));
-        }
-        table.add(row);
+    auto columns = overviewColumns();
+    if (oneSystem) {
+        columns.erase(columns.begin());
     }
     const bool noneUsesDhcp =
         std::all_of(interfaces.begin(), interfaces.end(),
                     [](const InterfaceOverview& each) { return each.dhcp == false; });
-    return table.text(width) + (noneUsesDhcp ? "No interface of this machine uses DHCP.\n" : "");
+    return tableOf(columns, interfaces).text(width, style) +
+           (noneUsesDhcp && style.header ? "No interface of this machine uses DHCP.\n" : "");
 }
 
 std::string remarkLine(std::span<const std::string> remarks) {

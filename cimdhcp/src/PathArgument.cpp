@@ -42,9 +42,9 @@ cimom::ObjectPath readClassArgument(const std::string& text, const std::string& 
 }
 
 cimom::ObjectPath readPathArgument(const std::string& text, const std::string& defaultNamespace,
-                                   const cimom::ClassRepository& repository) {
+                                   const ClassLookup& classes) {
     cimom::ObjectPath path = read(text, defaultNamespace, remedy);
-    const cimom::ClassDeclaration* const declaration = repository.find(path.className);
+    const cimom::ClassDeclaration* const declaration = classes.find(path.className);
     const bool keyed =
         declaration != nullptr &&
         std::any_of(declaration->properties.begin(), declaration->properties.end(),

@@ -1,34 +1,28 @@
 #include "cimdhcp/Program.h"
 
 #include <chrono>
+#include <cstdlib>
 #include <exception>
+#include <memory>
 #include <ostream>
-#include <type_traits>
 #include <variant>
 
 #include "cimdhcp/Check.h"
-#include "cimdhcp/CimCommands.h"
-#include "cimdhcp/ClassList.h"
-#include "cimdhcp/Client.h"
+#include "cimdhcp/ClientCommands.h"
 #include "cimdhcp/CommandLine.h"
 #include "cimdhcp/Directories.h"
+#include "cimdhcp/Duration.h"
+#include "cimdhcp/EmbeddedClient.h"
 #include "cimdhcp/Failure.h"
-#include "cimdhcp/Graph.h"
-#include "cimdhcp/GraphDrawing.h"
-#include "cimdhcp/JsonFormat.h"
-#include "cimdhcp/MachineOverview.h"
-#include "cimdhcp/MofFormat.h"
-#include "cimdhcp/Overview.h"
 #include "cimdhcp/PlatformSetup.h"
-#include "cimdhcp/Rename.h"
+#include "cimdhcp/Presentation.h"
+#include "cimdhcp/RemoteRun.h"
 #include "cimdhcp/Serve.h"
-#include "cimdhcp/TableFormat.h"
 #include "cimdhcp/UserAdd.h"
 #include "zrclient/InstrumentationService.h"
 #include "zrclient/LiveSource.h"
 #include "zrclient/SnapshotJson.h"
 #include "zrcommon/PlatformSettings.h"
-#include "zrcommon/PlatformUtilities.h"
 
 namespace cimdhcp {
 
@@ -37,35 +31,29 @@ namespace {
 /// How long the service processor may take.
 constexpr std::chrono::seconds patience(1);
 
-/// Runs one command line.
+/// The service processor answers when it likes, and no request waits for it. This
+/// program ends after one request: the provider is made to ask, then a question is
+/// asked behind its own, and the answer to that one awaited.
+void awaitServiceProcessor(Client& client) {
+    if (!ZR::InstrumentationService::process().awaiting()) {
+        return;
+    }
+    static_cast<void>(client.enumerateNames(client.classPath("QVXZR_DHCPProtocolEndpoint")));
+    ZR::InstrumentationService(ZR::openLiveSource()).settle(patience);
+}
+
+std::unique_ptr<EmbeddedClient> openClient(const Options& options) {
+    auto client = std::make_unique<EmbeddedClient>(
+        findDirectories(options, installations(executableFile())), options.nameSpace);
+    awaitServiceProcessor(*client);
+    return client;
+}
+
+/// Runs one command line on this machine.
 class Execution {
   public:
-    Execution(const Options& options, const Outputs& outputs)
-        : options_(options), outputs_(outputs) {}
-
-    void operator()(const ShowCommand& /*command*/) const {
-        Client client = openClient();
-        const ServedInstances served = askProvider(client);
-        const auto snapshot = ZR::InstrumentationService::process().current();
-        auto interfaces = interfacesOf(*snapshot);
-        addServed(served, client.repository(), interfaces);
-        outputs_.out << (json() ? overviewJson(interfaces)
-                                : overviewTable(interfaces, outputs_.width));
-        outputs_.err << remarkLine(snapshot->remarks());
-    }
-
-    void operator()(const RenameCommand& command) const {
-        Client client = openClient();
-        const RenameReport report =
-            rename(command, ZR::PlatformUtilities::getKestraDataDir(), client);
-        outputs_.out << (json() ? renameJson(report) : renameText(report));
-    }
-
-    void operator()(const GraphCommand& command) const {
-        Client client = openClient();
-        const std::string text = graphvizText(graphOfMachine(client));
-        outputs_.out << (command.svg ? drawSvg(text) : text);
-    }
+    Execution(const CommandLine& line, const Presentation& presentation, const Outputs& outputs)
+        : line_(line), presentation_(presentation), outputs_(outputs) {}
 
     void operator()(const TreeCommand& command) const {
         auto& service = ZR::InstrumentationService::process();
@@ -80,20 +68,14 @@ class Execution {
         outputs_.out << ZR::toJson(*service.current());
     }
 
-    void operator()(const ClassesCommand& /*command*/) const {
-        const Client client = openClient();
-        const auto classes = servedClasses(client.registrations(), client.repository());
-        outputs_.out << (json() ? classJson(classes) : classTable(classes, outputs_.width));
-    }
-
     void operator()(const ServeCommand& command) const {
-        Client client = openClient();
-        serve(command, client, outputs_.out);
+        const auto client = openClient(line_.options);
+        serve(command, *client, outputs_.out);
     }
 
     void operator()(const CheckCommand& /*command*/) const {
-        const auto findings = check(options_, installations(executableFile()));
-        outputs_.out << (json() ? checkJson(findings) : checkText(findings));
+        const auto findings = check(line_.options, installations(executableFile()));
+        outputs_.out << (presentation_.json() ? checkJson(findings) : checkText(findings));
         if (!isGood(findings)) {
             throw Failure(ExitStatus::notDone, "something is wrong, as the list tells");
         }
@@ -103,82 +85,77 @@ class Execution {
         addUser(command, outputs_.out, outputs_.err);
     }
 
-    template <typename CimCommand>
-    void operator()(const CimCommand& command) const {
-        Client client = openClient();
-        const Request request = carryOut(command, client);
-        outputs_.out << formatted(request.answer, client);
-        if (!request.answer.status.ok()) {
-            throw client.failure(request.answer, request.asked);
-        }
-        if (std::is_same_v<CimCommand, ModifyCommand> && options_.format == Format::table) {
-            outputs_.out << "Modified.\n";
+    template <typename ClientCommand>
+    void operator()(const ClientCommand& /*command*/) const {
+        const auto client = openClient(line_.options);
+        const Outcome outcome = carryOut(line_.command, *client, presentation_);
+        outputs_.out << outcome.text;
+        outputs_.err << outcome.remarks;
+        if (outcome.failure) {
+            throw Failure(*outcome.failure);
         }
     }
 
   private:
-    [[nodiscard]] bool json() const { return options_.format == Format::json; }
-
-    [[nodiscard]] Client openClient() const {
-        Client client{findDirectories(options_, installations(executableFile())),
-                      options_.nameSpace};
-        awaitServiceProcessor(client);
-        return client;
-    }
-
-    /// The service processor answers when it likes, and no request waits for it. This
-    /// program ends after one request: the provider is made to ask, then a question is
-    /// asked behind its own, and the answer to that one awaited.
-    static void awaitServiceProcessor(Client& client) {
-        if (!ZR::InstrumentationService::process().awaiting()) {
-            return;
-        }
-        static_cast<void>(client.enumerateNames(client.classPath("QVXZR_DHCPProtocolEndpoint")));
-        ZR::InstrumentationService(ZR::openLiveSource()).settle(patience);
-    }
-
-    [[nodiscard]] std::string formatted(const Answer& answer, const Client& client) const {
-        switch (options_.format) {
-            case Format::json:
-                return asJson(answer);
-            case Format::mof:
-                return asMof(answer, client.repository());
-            case Format::table:
-                break;
-        }
-        return asTable(answer, client.repository(), outputs_.width);
-    }
-
-    const Options& options_;
+    const CommandLine& line_;
+    const Presentation& presentation_;
     const Outputs& outputs_;
 };
 
-void runCommand(const std::vector<std::string>& arguments, const Outputs& outputs) {
-    const auto parsed = readCommandLine(arguments);
-    if (const auto* const information = std::get_if<Information>(&parsed)) {
-        outputs.out << information->text;
-    } else {
-        const auto& line = std::get<CommandLine>(parsed);
-        // Who may use the server has nothing to do with the machine; the check does
-        // this itself, and goes on when it fails.
-        if (!std::holds_alternative<UserAddCommand>(line.command) &&
-            !std::holds_alternative<CheckCommand>(line.command)) {
-            setUpPlatform(line.options, outputs.err);
-        }
-        std::visit(Execution(line.options, outputs), line.command);
+Style styleFor(const Options& options, bool terminal) {
+    return {!options.noHeader,
+            wantsColor(options.color, terminal, std::getenv("NO_COLOR"), std::getenv("TERM"))};
+}
+
+Presentation presentationOf(const CommandLine& line, const Outputs& outputs) {
+    const Options& options = line.options;
+    Presentation presentation;
+    presentation.format = options.format;
+    presentation.width = outputs.width;
+    presentation.style = styleFor(options, outputs.width.has_value());
+    presentation.sort = options.sort;
+    presentation.count = options.count;
+    presentation.comments =
+        options.format == Format::mof || std::holds_alternative<GraphCommand>(line.command);
+    return presentation;
+}
+
+ExitStatus runLine(const CommandLine& line, const Outputs& outputs, const Style& errorStyle) {
+    const Presentation presentation = presentationOf(line, outputs);
+    if (line.options.remote()) {
+        return runRemotely(line, presentation, outputs, errorStyle);
     }
+    // Who may use the server has nothing to do with the machine; the check does this
+    // itself, and goes on when it fails.
+    if (!std::holds_alternative<UserAddCommand>(line.command) &&
+        !std::holds_alternative<CheckCommand>(line.command)) {
+        setUpPlatform(line.options, outputs.err);
+    }
+    std::visit(Execution(line, presentation, outputs), line.command);
+    return ExitStatus::ok;
 }
 
 }  // namespace
 
 int run(const std::vector<std::string>& arguments, const Outputs& outputs) noexcept {
     ExitStatus status = ExitStatus::ok;
+    Style errorStyle;
     const auto complain = [&](ExitStatus reason, const char* message) {
         status = reason;
-        outputs.err << "cimdhcp: " << message << '\n';
+        outputs.err << errorStyle.alarming("cimdhcp:") << ' ' << message << '\n';
     };
+    const auto start = std::chrono::steady_clock::now();
+    bool time = false;
     try {
-        runCommand(arguments, outputs);
+        const auto parsed = readCommandLine(arguments);
+        if (const auto* const information = std::get_if<Information>(&parsed)) {
+            outputs.out << information->text;
+        } else {
+            const auto& line = std::get<CommandLine>(parsed);
+            time = line.options.time;
+            errorStyle = styleFor(line.options, outputs.errWidth.has_value());
+            status = runLine(line, outputs, errorStyle);
+        }
     } catch (const Failure& failure) {
         complain(failure.status(), failure.what());
     } catch (const std::exception& exception) {
@@ -187,6 +164,10 @@ int run(const std::vector<std::string>& arguments, const Outputs& outputs) noexc
     // What has been printed before a failure is to come out, too.
     if (!outputs.out.flush() && status == ExitStatus::ok) {
         complain(ExitStatus::notLoaded, "the output cannot be written");
+    }
+    if (time) {
+        outputs.err << "cimdhcp: it took " << durationText(std::chrono::steady_clock::now() - start)
+                    << '\n';
     }
     return static_cast<int>(status);
 }

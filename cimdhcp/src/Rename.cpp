@@ -113,9 +113,19 @@ void prepareFile(const RenameCommand& command, RenameReport& report) {
     report.fileCreated = true;
 }
 
+std::string fileOf(const Setting& setting, const std::string& dataDir) {
+    auto file = configurationFilePath(dataDir, setting.interfaceName);
+    if (!file) {
+        throw Failure(ExitStatus::notDone, "the name \"" + printable(setting.interfaceName) +
+                                               "\" cannot be part of a file's name: such an "
+                                               "interface has no configuration file");
+    }
+    return *std::move(file);
+}
+
 }  // namespace
 
-RenameReport rename(const RenameCommand& command, const std::string& dataDir, Client& client) {
+RenameReport rename(const RenameCommand& command, Client& client) {
     if (!canBeConfigurationName(command.name)) {
         throw Failure(ExitStatus::usage,
                       "\"" + printable(command.name) +
@@ -123,19 +133,17 @@ RenameReport rename(const RenameCommand& command, const std::string& dataDir, Cl
                           "at its ends or quotation marks around it");
     }
     const Setting setting = find(command.interfaceName, settings(client));
-    const auto file = configurationFilePath(dataDir, setting.interfaceName);
-    if (!file) {
-        throw Failure(ExitStatus::notDone, "the name \"" + printable(setting.interfaceName) +
-                                               "\" cannot be part of a file's name: such an "
-                                               "interface has no configuration file");
-    }
     RenameReport report;
     report.interfaceName = setting.interfaceName;
-    report.file = *file;
-    report.dataDir = dataDir;
     report.newName = command.name;
+    if (const auto dataDir = client.dataDir()) {
+        report.dataDir = *dataDir;
+        report.file = fileOf(setting, *dataDir);
+    }
     report.oldName = nameNow(setting.path, client);
-    prepareFile(command, report);
+    if (!report.file.empty()) {
+        prepareFile(command, report);
+    }
 
     const cimom::Instance wanted{setting.path,
                                  {{nameProperty, cimom::Value::ofString(command.name)}}};
@@ -145,9 +153,12 @@ RenameReport rename(const RenameCommand& command, const std::string& dataDir, Cl
     }
     const std::string name = nameNow(setting.path, client);
     if (name != command.name) {
-        throw Failure(ExitStatus::notDone, "the configuration name of " + report.interfaceName +
-                                               " is still \"" + printable(name) +
-                                               "\": " + printable(whyUnchanged(report.file)));
+        throw Failure(ExitStatus::notDone,
+                      "the configuration name of " + printable(report.interfaceName) +
+                          " is still \"" + printable(name) + "\": " +
+                          (report.file.empty()
+                               ? "that machine has no configuration file for it, or cannot write it"
+                               : printable(whyUnchanged(report.file))));
     }
     return report;
 }
@@ -160,25 +171,24 @@ std::string renameText(const RenameReport& report) {
     if (report.fileCreated) {
         text += "Made the file " + printable(report.file) + ".\n";
     }
-    text += report.interfaceName + ": the configuration name is now \"" +
+    text += printable(report.interfaceName) + ": the configuration name is now \"" +
             printable(report.newName) + '"';
     if (!report.oldName.empty()) {
         text += ", was \"" + printable(report.oldName) + '"';
     }
-    return text + " (" + printable(report.file) + ").\n";
+    return text + (report.file.empty() ? "" : " (" + printable(report.file) + ')') + ".\n";
 }
 
 std::string renameJson(const RenameReport& report) {
-    nlohmann::ordered_json oldName;
-    if (!report.oldName.empty()) {
-        oldName = report.oldName;
-    }
+    const auto json = [](const std::string& text) {
+        return text.empty() ? nlohmann::ordered_json(nullptr) : nlohmann::ordered_json(text);
+    };
     return jsonText({{"operation", "rename"},
                      {"interface", report.interfaceName},
-                     {"file", report.file},
+                     {"file", json(report.file)},
                      {"fileCreated", report.fileCreated},
                      {"directoryCreated", report.directoryCreated},
-                     {"oldName", std::move(oldName)},
+                     {"oldName", json(report.oldName)},
                      {"newName", report.newName}});
 }
 

@@ -3,9 +3,15 @@
 #include <array>
 #include <cerrno>
 #include <charconv>
+#include <chrono>
+#include <condition_variable>
 #include <csignal>
+#include <cstdlib>
 #include <cstring>
+#include <mutex>
+#include <optional>
 #include <system_error>
+#include <thread>
 
 #include "cimdhcp/DisplayText.h"
 #include "cimdhcp/Failure.h"
@@ -71,6 +77,37 @@ sigset_t blockEndSignals() {
     return signals;
 }
 
+/// Ends the process, without what cannot be ended, should that take too long: an
+/// operation of a provider may never return, and its thread cannot be stopped.
+class EndInTime {
+  public:
+    explicit EndInTime(std::chrono::seconds patience)
+        : thread_([this, patience] {
+              std::unique_lock lock(mutex_);
+              if (!ended_.wait_for(lock, patience, [this] { return over_; })) {
+                  log(cimom::wbem::LogKind::failure,
+                      "ending without waiting for operations that do not return");
+                  std::_Exit(static_cast<int>(ExitStatus::ok));
+              }
+          }) {}
+    ~EndInTime() {
+        {
+            const std::lock_guard lock(mutex_);
+            over_ = true;
+        }
+        ended_.notify_one();
+        thread_.join();
+    }
+    EndInTime(const EndInTime&) = delete;
+    EndInTime& operator=(const EndInTime&) = delete;
+
+  private:
+    std::mutex mutex_;
+    std::condition_variable ended_;
+    bool over_ = false;
+    std::thread thread_;
+};
+
 }  // namespace
 
 Listening readListening(const std::string& text) {
@@ -107,9 +144,12 @@ Listening readListening(const std::string& text) {
     return listening;
 }
 
-void serve(const ServeCommand& command, Client& client, std::ostream& out) {
+void serve(const ServeCommand& command, EmbeddedClient& client, std::ostream& out) {
     const sigset_t signals = blockEndSignals();
     try {
+        // Shorter than service managers wait before they kill.
+        constexpr std::chrono::seconds patience(5);
+        std::optional<EndInTime> end;
         cimom::wbem::Server server(client.manager(), settingsOf(command), log);
         log(cimom::wbem::LogKind::notice, "listening on " + server.url());
         out << "Listening on " << server.url() << std::endl;
@@ -117,6 +157,7 @@ void serve(const ServeCommand& command, Client& client, std::ostream& out) {
         while (::sigwait(&signals, &signal) != 0) {
         }
         log(cimom::wbem::LogKind::notice, "ending by signal " + std::to_string(signal));
+        end.emplace(patience);
     } catch (const cimom::wbem::ServerError& error) {
         throw Failure(ExitStatus::notLoaded, printable(error.what()));
     } catch (const cimom::wbem::UsersError& error) {

@@ -2,6 +2,7 @@
 
 #include "cimdhcp/DisplayText.h"
 #include "cimom/ObjectPathText.h"
+#include "wbem/Errors.h"
 
 namespace cimdhcp {
 
@@ -39,9 +40,14 @@ std::string remedy(const Answer& answer, const cimom::ObjectPath& asked) {
 
 }  // namespace
 
+std::string_view statusNameOf(const cimom::Status& status) noexcept {
+    return status.ok() ? cimom::statusName(status.code)
+                       : cimom::wbem::cimStatusName(static_cast<unsigned>(status.code));
+}
+
 std::string statusMessage(const Answer& answer, const cimom::ObjectPath& asked) {
     const std::string& words = answer.status.message;
-    return std::string(cimom::statusName(answer.status.code)) + ": " +
+    return std::string(statusNameOf(answer.status)) + ": " +
            printable(words.empty() ? explanation(answer, asked) : words) + remedy(answer, asked);
 }
 

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <numeric>
+#include <span>
 #include <stdexcept>
 
 #include "cimdhcp/DisplayText.h"
@@ -48,9 +49,11 @@ void Table::add(const std::vector<std::string>& cells) {
     rows_.push_back(std::move(row));
 }
 
-std::string Table::text(std::optional<std::size_t> width) const {
+std::string Table::text(std::optional<std::size_t> width, const Style& style) const {
     std::vector<std::size_t> widths(rows_.front().size());
-    for (const auto& row : rows_) {
+    const std::span<const std::vector<std::string>> shown =
+        std::span(rows_).subspan(style.header ? 0 : 1);
+    for (const auto& row : shown) {
         for (std::size_t column = 0; column < row.size(); ++column) {
             widths[column] = std::max(widths[column], displayWidth(row[column]));
         }
@@ -59,7 +62,7 @@ std::string Table::text(std::optional<std::size_t> width) const {
         shrink(widths, *width);
     }
     std::string result;
-    for (const auto& row : rows_) {
+    for (const auto& row : shown) {
         std::string line;
         for (std::size_t column = 0; column < row.size(); ++column) {
             const std::string cell =
@@ -68,7 +71,8 @@ std::string Table::text(std::optional<std::size_t> width) const {
             line.append(widths[column] + gap - std::min(displayWidth(cell), widths[column]), ' ');
         }
         line.erase(line.find_last_not_of(' ') + 1);
-        result += line + '\n';
+        const bool heading = &row == rows_.data();
+        result += (heading ? style.strong(line) : line) + '\n';
     }
     return result;
 }

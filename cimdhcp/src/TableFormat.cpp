@@ -14,7 +14,7 @@ namespace {
 constexpr std::size_t narrowestValue = 20;
 
 std::string block(const cimom::Instance& instance, const cimom::ClassDeclaration* declaration,
-                  std::optional<std::size_t> width) {
+                  std::optional<std::size_t> width, const Style& style) {
     std::size_t longest = 0;
     for (const cimom::NamedValue& property : instance.properties) {
         if (!property.value.isNull()) {
@@ -22,7 +22,7 @@ std::string block(const cimom::Instance& instance, const cimom::ClassDeclaration
         }
     }
     const std::size_t indentation = 2 + longest + 3;
-    std::string text = printable(cimom::toText(instance.path)) + '\n';
+    std::string text = style.strong(printable(cimom::toText(instance.path))) + '\n';
     for (const cimom::NamedValue& property : instance.properties) {
         if (property.value.isNull()) {
             continue;
@@ -42,8 +42,8 @@ std::string block(const cimom::Instance& instance, const cimom::ClassDeclaration
 
 }  // namespace
 
-std::string asTable(const Answer& answer, const cimom::ClassRepository& repository,
-                    std::optional<std::size_t> width) {
+std::string asTable(const Answer& answer, const ClassLookup& classes,
+                    std::optional<std::size_t> width, const Style& style) {
     std::string text;
     for (const auto& path : answer.paths) {
         text += path ? printable(cimom::toText(*path)) : "(null)";
@@ -51,7 +51,7 @@ std::string asTable(const Answer& answer, const cimom::ClassRepository& reposito
     }
     for (const auto& instance : answer.instances) {
         text += text.empty() ? "" : "\n";
-        text += instance ? block(*instance, repository.find(instance->path.className), width)
+        text += instance ? block(*instance, classes.find(instance->path.className), width, style)
                          : "(null)\n";
     }
     return text;

@@ -1,6 +1,5 @@
 // From what providers delivered to what clients get.
 #include <algorithm>
-#include <iterator>
 
 #include "ObjectManagerImplementation.h"
 
@@ -66,59 +65,23 @@ void ObjectManager::Implementation::complete(Instance& instance,
     complete(instance.path, nameSpace);
 }
 
-PathsResult ObjectManager::Implementation::pathsFrom(Outcomes outcomes,
-                                                     const std::string& nameSpace) const {
-    PathsResult result;
-    result.status = overall(outcomes.calls, outcomes.exact);
-    for (CallOutcome& call : outcomes.calls) {
-        result.returnDoneCalls += call.delivery.returnDoneCalls;
-        if (result.status.ok()) {
-            std::move(call.delivery.paths.begin(), call.delivery.paths.end(),
-                      std::back_inserter(result.paths));
-        }
+RequestEnd endOf(const std::vector<CallOutcome>& calls, bool exact) {
+    RequestEnd end{overall(calls, exact)};
+    for (const CallOutcome& call : calls) {
+        end.returnDoneCalls += call.returnDoneCalls;
     }
-    for (auto& path : result.paths) {
-        if (path) {
-            complete(*path, nameSpace);
-        }
-    }
-    return result;
+    return end;
 }
 
-InstancesResult ObjectManager::Implementation::instancesFrom(Outcomes outcomes,
-                                                             const std::string& nameSpace) const {
-    InstancesResult result;
-    result.status = overall(outcomes.calls, outcomes.exact);
-    for (CallOutcome& call : outcomes.calls) {
-        result.returnDoneCalls += call.delivery.returnDoneCalls;
-        if (result.status.ok()) {
-            std::move(call.delivery.instances.begin(), call.delivery.instances.end(),
-                      std::back_inserter(result.instances));
-        }
-    }
-    for (auto& instance : result.instances) {
-        if (instance) {
-            complete(*instance, nameSpace);
-        }
-    }
-    return result;
-}
-
-void applyPropertyList(InstancesResult& result,
+void applyPropertyList(Instance& instance,
                        const std::optional<std::vector<std::string>>& propertyList) {
     if (!propertyList) {
         return;
     }
-    for (auto& instance : result.instances) {
-        if (!instance) {
-            continue;
-        }
-        std::erase_if(instance->properties, [&](const NamedValue& property) {
-            return std::none_of(
-                propertyList->begin(), propertyList->end(),
-                [&](const std::string& name) { return sameName(name, property.name); });
-        });
-    }
+    std::erase_if(instance.properties, [&](const NamedValue& property) {
+        return std::none_of(propertyList->begin(), propertyList->end(),
+                            [&](const std::string& name) { return sameName(name, property.name); });
+    });
 }
 
 }  // namespace cimom

@@ -8,10 +8,16 @@
 #include <type_traits>
 #include <utility>
 
+#include "TemporaryFile.h"
+
 namespace cimom::broker {
 
 /// Memory that only grows and is given back as a whole. Objects in it are never
 /// destroyed one by one, so only trivially destructible types may live there.
+///
+/// A provider may go on using whatever it got until its request ends, also what it
+/// has long delivered. What an arena has beyond a megabyte or two is therefore backed
+/// by a temporary file, and leaves the process' memory while nobody touches it.
 ///
 /// An arena of a request belongs to the thread that runs the request and takes
 /// no lock. A clone has an arena of its own, whose root is the clone; it may
@@ -67,10 +73,15 @@ class Arena {
     /// Bytes taken from the system so far.
     [[nodiscard]] std::size_t reserved() const noexcept { return reserved_; }
 
+    /// What one arena may take in all: a provider that makes objects for ever must
+    /// not fill the disk.
+    static constexpr std::size_t largest = std::size_t{1} << 31U;
+
   private:
     static constexpr std::size_t alignment = alignof(std::max_align_t);
     struct Chunk {
         Chunk* previous;
+        std::size_t mapped;  ///< bytes of the file; 0: memory of its own
     };
 
     void* bump(std::size_t bytes) {
@@ -83,6 +94,8 @@ class Arena {
         return memory;
     }
     void* grow(std::size_t bytes);
+    /// A chunk in the file; null when there is no room for it.
+    void* growInFile(std::size_t size) noexcept;
 
     std::byte* next_ = nullptr;
     std::byte* end_ = nullptr;
@@ -90,6 +103,8 @@ class Arena {
     std::size_t nextChunk_ = std::size_t{16} * 1024;
     std::size_t reserved_ = 0;
     const void* root_ = nullptr;
+    std::unique_ptr<TemporaryFile> file_;
+    std::size_t fileSize_ = 0;
     bool locked_ = false;
     std::mutex mutex_;
 };

@@ -13,15 +13,6 @@ const char* pointer(const std::optional<std::string>& text) noexcept {
     return text ? text->c_str() : nullptr;
 }
 
-CallOutcome failed(Status status) {
-    return {std::move(status), {}};
-}
-
-CallOutcome withoutSlot(const Provider& provider, const char* slot) {
-    return failed(
-        {CMPI_RC_ERR_NOT_SUPPORTED, "provider " + provider.name() + " does not offer " + slot});
-}
-
 Instance asInstance(const ObjectPath& path) {
     return {path, {}};
 }
@@ -33,13 +24,6 @@ const ObjectPath& pathOf(const ObjectPath& path) noexcept {
 }
 const ObjectPath& pathOf(const Instance& instance) noexcept {
     return instance.path;
-}
-
-/// Removes what `keep` refuses. Absent entries stay: they are no objects that a
-/// filter could judge.
-template <typename Item, typename Keep>
-void filter(std::vector<std::optional<Item>>& items, Keep&& keep) {
-    std::erase_if(items, [&keep](const auto& item) { return item && !keep(*item); });
 }
 
 }  // namespace
@@ -56,64 +40,68 @@ std::vector<Provider*> ObjectManager::Implementation::associationProviders(
     return found;
 }
 
-CallOutcome ObjectManager::Implementation::callAssociators(Provider& provider, Kind kind,
-                                                           const ObjectPath& path,
-                                                           const AssociationRequest& request) {
+template <typename Slot, typename Invoke>
+CallOutcome ObjectManager::Implementation::callAssociation(Provider& provider,
+                                                           Slot CMPIAssociationMIFT::*slot,
+                                                           const char* name, const ObjectPath& path,
+                                                           const std::string& principal,
+                                                           const Sink& sink, Invoke&& invoke) {
     Status status;
     CMPIAssociationMI* const mi = provider.association(path.nameSpace, status);
     if (mi == nullptr) {
-        return failed(std::move(status));
+        return {std::move(status)};
     }
-    const CMPIAssociationMIFT& table = *mi->ft;
-    const char* const slot = kind == Kind::paths ? "associatorNames" : "associators";
-    const std::string who = "provider " + provider.name() + ": " + slot;
-    PropertyNames names(request.propertyList);
-    if (kind == Kind::paths ? table.associatorNames == nullptr : table.associators == nullptr) {
-        return withoutSlot(provider, slot);
+    const Slot function = mi->ft->*slot;
+    if (function == nullptr) {
+        return missingSlot(provider.name(), name);
     }
-    return callProvider(
-        settings(request.principal, 0), kind, who, path,
-        [&](const auto* context, const auto* result, const auto* op) {
-            return kind == Kind::paths
-                       ? table.associatorNames(mi, context, result, op, pointer(request.assocClass),
-                                               pointer(request.resultClass), pointer(request.role),
-                                               pointer(request.resultRole))
-                       : table.associators(mi, context, result, op, pointer(request.assocClass),
-                                           pointer(request.resultClass), pointer(request.role),
-                                           pointer(request.resultRole), names.pointer());
-        });
+    return callProvider(settings(principal, 0), sink, "provider " + provider.name() + ": " + name,
+                        path, [&](const auto* context, const auto* result, const auto* op) {
+                            return invoke(function, mi, context, result, op);
+                        });
 }
 
-CallOutcome ObjectManager::Implementation::callReferences(Provider& provider, Kind kind,
+CallOutcome ObjectManager::Implementation::callAssociators(Provider& provider,
+                                                           const ObjectPath& path,
+                                                           const AssociationRequest& request,
+                                                           const Sink& sink) {
+    const auto call = [&](auto slot, const char* name, auto... further) {
+        return callAssociation(
+            provider, slot, name, path, request.principal, sink,
+            [&](auto function, auto* mi, const auto* context, const auto* result, const auto* op) {
+                return function(mi, context, result, op, pointer(request.assocClass),
+                                pointer(request.resultClass), pointer(request.role),
+                                pointer(request.resultRole), further...);
+            });
+    };
+    PropertyNames names(request.propertyList);
+    return sink.kind == Kind::paths
+               ? call(&CMPIAssociationMIFT::associatorNames, "associatorNames")
+               : call(&CMPIAssociationMIFT::associators, "associators", names.pointer());
+}
+
+CallOutcome ObjectManager::Implementation::callReferences(Provider& provider,
                                                           const ObjectPath& path,
                                                           const std::string& resultClass,
-                                                          const AssociationRequest& request) {
-    Status status;
-    CMPIAssociationMI* const mi = provider.association(path.nameSpace, status);
-    if (mi == nullptr) {
-        return failed(std::move(status));
-    }
-    const CMPIAssociationMIFT& table = *mi->ft;
-    const char* const slot = kind == Kind::paths ? "referenceNames" : "references";
-    const std::string who = "provider " + provider.name() + ": " + slot;
+                                                          const AssociationRequest& request,
+                                                          const Sink& sink) {
+    const auto call = [&](auto slot, const char* name, auto... further) {
+        return callAssociation(
+            provider, slot, name, path, request.principal, sink,
+            [&](auto function, auto* mi, const auto* context, const auto* result, const auto* op) {
+                return function(mi, context, result, op, resultClass.c_str(), pointer(request.role),
+                                further...);
+            });
+    };
     PropertyNames names(request.propertyList);
-    if (kind == Kind::paths ? table.referenceNames == nullptr : table.references == nullptr) {
-        return withoutSlot(provider, slot);
-    }
-    return callProvider(
-        settings(request.principal, 0), kind, who, path,
-        [&](const auto* context, const auto* result, const auto* op) {
-            return kind == Kind::paths
-                       ? table.referenceNames(mi, context, result, op, resultClass.c_str(),
-                                              pointer(request.role))
-                       : table.references(mi, context, result, op, resultClass.c_str(),
-                                          pointer(request.role), names.pointer());
-        });
+    return sink.kind == Kind::paths
+               ? call(&CMPIAssociationMIFT::referenceNames, "referenceNames")
+               : call(&CMPIAssociationMIFT::references, "references", names.pointer());
 }
 
 /// Every association provider is asked once, for all of its associations.
 ObjectManager::Implementation::Outcomes ObjectManager::Implementation::askAssociators(
-    Kind kind, const ObjectPath& path, const AssociationRequest& request) {
+    const ObjectPath& path, const AssociationRequest& request, const Sink& sink) {
     AssociationRequest passed = request;
     if (passed.assocClass) {
         passed.assocClass = canonicalClass(*passed.assocClass);
@@ -128,7 +116,7 @@ ObjectManager::Implementation::Outcomes ObjectManager::Implementation::askAssoci
     Outcomes outcomes;
     const std::vector<Provider*> providers = associationProviders(path.nameSpace);
     for (Provider* const provider : providers) {
-        outcomes.calls.push_back(callAssociators(*provider, kind, path, passed));
+        outcomes.calls.push_back(callAssociators(*provider, path, passed, sink));
     }
     // Of several providers, those that answered count; what all of them refuse is refused.
     const auto answered = [](const CallOutcome& call) {
@@ -146,13 +134,13 @@ ObjectManager::Implementation::Outcomes ObjectManager::Implementation::askAssoci
 
 /// Providers know their association classes by their exact names.
 ObjectManager::Implementation::Outcomes ObjectManager::Implementation::askReferences(
-    Kind kind, const ObjectPath& path, const AssociationRequest& request) {
+    const ObjectPath& path, const AssociationRequest& request, const Sink& sink) {
     Outcomes outcomes;
     if (request.resultClass && repository_.find(*request.resultClass) == nullptr) {
         // Unknown here; the providers say what that means.
         for (Provider* const provider : associationProviders(path.nameSpace)) {
             outcomes.calls.push_back(
-                callReferences(*provider, kind, path, *request.resultClass, request));
+                callReferences(*provider, path, *request.resultClass, request, sink));
         }
         outcomes.exact = outcomes.calls.size() == 1;
         return outcomes;
@@ -177,7 +165,7 @@ ObjectManager::Implementation::Outcomes ObjectManager::Implementation::askRefere
                      sameName(targets.front()->declaration->name, *request.resultClass);
     for (const ServedClass* const target : targets) {
         outcomes.calls.push_back(
-            callReferences(*target->provider, kind, path, target->declaration->name, request));
+            callReferences(*target->provider, path, target->declaration->name, request, sink));
     }
     return outcomes;
 }
@@ -187,7 +175,9 @@ std::optional<std::vector<Instance>> ObjectManager::Implementation::associations
     AssociationRequest wanted;
     wanted.resultClass = request.assocClass;
     wanted.principal = request.principal;
-    Outcomes outcomes = askReferences(Kind::instances, path, wanted);
+    Collection<Instance> collection;
+    const Outcomes outcomes =
+        askReferences(path, wanted, sinkTo(collection, path.nameSpace, std::nullopt, everything));
     const auto unsupported = [](const CallOutcome& call) {
         return call.status.code == CMPI_RC_ERR_NOT_SUPPORTED;
     };
@@ -196,112 +186,88 @@ std::optional<std::vector<Instance>> ObjectManager::Implementation::associations
         return std::nullopt;
     }
     std::vector<Instance> associations;
-    for (auto& instance : instancesFrom(std::move(outcomes), path.nameSpace).instances) {
-        if (instance) {
-            associations.push_back(std::move(*instance));
+    if (endOf(outcomes.calls, outcomes.exact).status.ok()) {
+        for (auto& instance : collection.objects) {
+            if (instance) {
+                associations.push_back(*std::move(instance));
+            }
         }
     }
     return associations;
 }
 
-namespace {
-
-/// What a provider may have left unfiltered of an associator request.
-/// `associations` is asked for only when there is something to filter by role.
-template <typename Item, typename Associations>
-void filterAssociators(std::vector<std::optional<Item>>& items, const ObjectPath& source,
-                       const AssociationRequest& request, const ClassRepository& repository,
-                       Associations&& associations) {
-    filter(items, [&](const Item& item) {
-        return isOfClass(pathOf(item).className, request.resultClass, repository);
-    });
-    if (items.empty() || (!request.role && !request.resultRole)) {
-        return;
-    }
-    // Without anyone who could tell the roles, the provider's own answer counts.
-    if (const auto known = associations()) {
-        filter(items, [&](const Item& item) {
-            return connects(*known, source, pathOf(item), request.role, request.resultRole,
-                            repository);
+/// The provider compares classes by name, and may leave roles to others.
+template <typename Object>
+RequestEnd ObjectManager::Implementation::associated(ObjectPath path,
+                                                     const AssociationRequest& request,
+                                                     Receiver<Object>& receiver) {
+    const auto isWanted = [&](const Object& object) {
+        return isOfClass(pathOf(object).className, request.resultClass, repository_);
+    };
+    if (!request.role && !request.resultRole) {
+        return run(path, [&] {
+            return askAssociators(path, request,
+                                  sinkTo(receiver, path.nameSpace, request.propertyList, isWanted));
         });
     }
-}
-
-template <typename Item>
-void filterReferences(std::vector<std::optional<Item>>& items, const ObjectPath& source,
-                      const AssociationRequest& request, const ClassRepository& repository) {
-    filter(items, [&](const Item& item) {
-        return isOfClass(pathOf(item).className, request.resultClass, repository) &&
-               playsRole(asInstance(item), source, request.role, repository);
+    return run(path, [&] {
+        Collection<Object> collection;
+        Outcomes outcomes = askAssociators(
+            path, request, sinkTo(collection, path.nameSpace, request.propertyList, isWanted));
+        if (collection.objects.empty() || !endOf(outcomes.calls, outcomes.exact).status.ok()) {
+            return outcomes;
+        }
+        // The roles are known by further requests, which have to wait until the
+        // provider has returned: it may hold a lock while it delivers. Without anyone
+        // who could tell, its own answer counts.
+        const auto known = associationsOf(path, request);
+        for (auto& object : collection.objects) {
+            if (!object || !known ||
+                connects(*known, path, pathOf(*object), request.role, request.resultRole,
+                         repository_)) {
+                receiver.take(std::move(object));
+            }
+        }
+        return outcomes;
     });
 }
 
-Status refusal(const broker::ConversionError& error) {
-    return {CMPI_RC_ERR_INVALID_PARAMETER, error.what()};
+template <typename Object>
+RequestEnd ObjectManager::Implementation::referring(ObjectPath path,
+                                                    const AssociationRequest& request,
+                                                    Receiver<Object>& receiver) {
+    return run(path, [&] {
+        const auto isWanted = [&](const Object& object) {
+            return isOfClass(pathOf(object).className, request.resultClass, repository_) &&
+                   playsRole(asInstance(object), path, request.role, repository_);
+        };
+        return askReferences(path, request,
+                             sinkTo(receiver, path.nameSpace, request.propertyList, isWanted));
+    });
 }
 
-}  // namespace
-
-PathsResult ObjectManager::Implementation::associatorNames(ObjectPath path,
-                                                           const AssociationRequest& request) {
-    try {
-        if (Status status = canonical(path); !status.ok()) {
-            return {std::move(status), {}, 0};
-        }
-        PathsResult result = pathsFrom(askAssociators(Kind::paths, path, request), path.nameSpace);
-        filterAssociators(result.paths, path, request, repository_,
-                          [&] { return associationsOf(path, request); });
-        return result;
-    } catch (const broker::ConversionError& error) {
-        return {refusal(error), {}, 0};
-    }
+RequestEnd ObjectManager::Implementation::associatorNames(ObjectPath path,
+                                                          const AssociationRequest& request,
+                                                          Receiver<ObjectPath>& receiver) {
+    return associated(std::move(path), request, receiver);
 }
 
-InstancesResult ObjectManager::Implementation::associators(ObjectPath path,
-                                                           const AssociationRequest& request) {
-    try {
-        if (Status status = canonical(path); !status.ok()) {
-            return {std::move(status), {}, 0};
-        }
-        InstancesResult result =
-            instancesFrom(askAssociators(Kind::instances, path, request), path.nameSpace);
-        filterAssociators(result.instances, path, request, repository_,
-                          [&] { return associationsOf(path, request); });
-        applyPropertyList(result, request.propertyList);
-        return result;
-    } catch (const broker::ConversionError& error) {
-        return {refusal(error), {}, 0};
-    }
+RequestEnd ObjectManager::Implementation::associators(ObjectPath path,
+                                                      const AssociationRequest& request,
+                                                      Receiver<Instance>& receiver) {
+    return associated(std::move(path), request, receiver);
 }
 
-PathsResult ObjectManager::Implementation::referenceNames(ObjectPath path,
-                                                          const AssociationRequest& request) {
-    try {
-        if (Status status = canonical(path); !status.ok()) {
-            return {std::move(status), {}, 0};
-        }
-        PathsResult result = pathsFrom(askReferences(Kind::paths, path, request), path.nameSpace);
-        filterReferences(result.paths, path, request, repository_);
-        return result;
-    } catch (const broker::ConversionError& error) {
-        return {refusal(error), {}, 0};
-    }
+RequestEnd ObjectManager::Implementation::referenceNames(ObjectPath path,
+                                                         const AssociationRequest& request,
+                                                         Receiver<ObjectPath>& receiver) {
+    return referring(std::move(path), request, receiver);
 }
 
-InstancesResult ObjectManager::Implementation::references(ObjectPath path,
-                                                          const AssociationRequest& request) {
-    try {
-        if (Status status = canonical(path); !status.ok()) {
-            return {std::move(status), {}, 0};
-        }
-        InstancesResult result =
-            instancesFrom(askReferences(Kind::instances, path, request), path.nameSpace);
-        filterReferences(result.instances, path, request, repository_);
-        applyPropertyList(result, request.propertyList);
-        return result;
-    } catch (const broker::ConversionError& error) {
-        return {refusal(error), {}, 0};
-    }
+RequestEnd ObjectManager::Implementation::references(ObjectPath path,
+                                                     const AssociationRequest& request,
+                                                     Receiver<Instance>& receiver) {
+    return referring(std::move(path), request, receiver);
 }
 
 }  // namespace cimom

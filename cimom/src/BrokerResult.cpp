@@ -79,14 +79,44 @@ CMPIStatus returnError(const CMPIResult* self, const CMPIError* error) {
 const CMPIResultFT resultTable{CMPIVersion200, release,          clone,      returnData,
                                returnInstance, returnObjectPath, returnDone, returnError};
 
-ResultCollector::ResultCollector(Kind kind) noexcept : kind_(kind), record_{this, &resultTable} {}
+ResultCollector::ResultCollector(Kind kind, const Consumer* consumer) noexcept
+    : kind_(kind), consumer_(consumer), record_{this, &resultTable} {}
 
 Delivery ResultCollector::take() {
     const std::lock_guard lock(mutex_);
     return std::exchange(delivery_, Delivery{});
 }
 
+std::exception_ptr ResultCollector::failure() const {
+    const std::lock_guard lock(mutex_);
+    return failure_;
+}
+
+template <typename Object>
+CMPIrc ResultCollector::pass(std::optional<Object> object,
+                             std::function<void(std::optional<Object>)> Consumer::*receive,
+                             std::vector<std::optional<Object>>& kept) {
+    const std::lock_guard lock(mutex_);
+    if (failure_) {
+        return CMPI_RC_ERR_FAILED;
+    }
+    if (consumer_ == nullptr) {
+        kept.push_back(std::move(object));
+        return CMPI_RC_OK;
+    }
+    try {
+        (consumer_->*receive)(std::move(object));
+        return CMPI_RC_OK;
+    } catch (const std::exception&) {
+        failure_ = std::current_exception();
+        return CMPI_RC_ERR_FAILED;
+    }
+}
+
 CMPIrc ResultCollector::add(const CMPIInstance* instance) {
+    if (failure()) {
+        return CMPI_RC_ERR_FAILED;
+    }
     const InstanceRecord* const record = instanceOf(instance);
     if (instance != nullptr && record == nullptr) {
         return CMPI_RC_ERR_INVALID_PARAMETER;
@@ -99,12 +129,13 @@ CMPIrc ResultCollector::add(const CMPIInstance* instance) {
     if (record != nullptr) {
         copy = toModel(*record);
     }
-    const std::lock_guard lock(mutex_);
-    delivery_.instances.push_back(std::move(copy));
-    return CMPI_RC_OK;
+    return pass(std::move(copy), &Consumer::instance, delivery_.instances);
 }
 
 CMPIrc ResultCollector::add(const CMPIObjectPath* path) {
+    if (failure()) {
+        return CMPI_RC_ERR_FAILED;
+    }
     const PathRecord* const record = pathOf(path);
     if (path != nullptr && record == nullptr) {
         return CMPI_RC_ERR_INVALID_PARAMETER;
@@ -112,17 +143,14 @@ CMPIrc ResultCollector::add(const CMPIObjectPath* path) {
     if (kind_ == Kind::instances && record != nullptr) {
         return CMPI_RC_ERR_NOT_SUPPORTED;
     }
+    if (kind_ == Kind::instances) {
+        return pass(std::optional<Instance>(), &Consumer::instance, delivery_.instances);
+    }
     std::optional<ObjectPath> copy;
     if (record != nullptr) {
         copy = toModel(*record);
     }
-    const std::lock_guard lock(mutex_);
-    if (kind_ == Kind::paths) {
-        delivery_.paths.push_back(std::move(copy));
-    } else {
-        delivery_.instances.emplace_back();
-    }
-    return CMPI_RC_OK;
+    return pass(std::move(copy), &Consumer::path, delivery_.paths);
 }
 
 CMPIrc ResultCollector::add(const CMPIError* error) {

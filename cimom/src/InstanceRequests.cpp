@@ -9,24 +9,46 @@ namespace cimom {
 
 namespace {
 
-CallOutcome failed(Status status) {
-    return {std::move(status), {}};
-}
+/// Keeps the first instance that agrees with every key of a path, of however many.
+class FirstMatch final : public Receiver<Instance> {
+  public:
+    explicit FirstMatch(const ObjectPath& wanted) : wanted_(wanted) {}
+    void take(std::optional<Instance> instance) override {
+        if (!found && instance && hasKeys(*instance, wanted_)) {
+            found = std::move(instance);
+        }
+    }
+    [[nodiscard]] std::size_t mark() override { return found ? 1 : 0; }
+    void backTo(std::size_t mark) override {
+        if (mark == 0) {
+            found.reset();
+        }
+    }
 
-CallOutcome withoutSlot(const Provider& provider, const char* slot) {
-    return failed(
-        {CMPI_RC_ERR_NOT_SUPPORTED, "provider " + provider.name() + " does not offer " + slot});
+    std::optional<Instance> found;
+
+  private:
+    const ObjectPath& wanted_;
+};
+
+/// For calls that have no result, whatever the provider delivers.
+Sink nowhere() {
+    return {broker::ResultCollector::Kind::instances,
+            {nullptr, [](const std::optional<Instance>&) {}},
+            [] { return std::size_t{0}; },
+            [](std::size_t) {}};
 }
 
 }  // namespace
 
 CallOutcome ObjectManager::Implementation::callReading(const ServedClass& target, Reading reading,
                                                        ObjectPath path,
-                                                       const InstanceRequest& request) {
+                                                       const InstanceRequest& request,
+                                                       const Sink& sink) {
     Status status;
     CMPIInstanceMI* const mi = target.provider->instance(path.nameSpace, status);
     if (mi == nullptr) {
-        return failed(std::move(status));
+        return {std::move(status)};
     }
     // The provider sees the class that it serves, not the parent that was asked for.
     path.className = target.declaration->name;
@@ -34,11 +56,10 @@ CallOutcome ObjectManager::Implementation::callReading(const ServedClass& target
     const std::string who = "provider " + target.provider->name() + ": ";
     if (reading == Reading::names) {
         if (table.enumerateInstanceNames == nullptr) {
-            return withoutSlot(*target.provider, "enumerateInstanceNames");
+            return missingSlot(target.provider->name(), "enumerateInstanceNames");
         }
-        return callProvider(settings(request.principal, 0), Kind::paths,
-                            who + "enumerateInstanceNames", path,
-                            [&](const auto* context, const auto* result, const auto* op) {
+        return callProvider(settings(request.principal, 0), sink, who + "enumerateInstanceNames",
+                            path, [&](const auto* context, const auto* result, const auto* op) {
                                 return table.enumerateInstanceNames(mi, context, result, op);
                             });
     }
@@ -46,11 +67,11 @@ CallOutcome ObjectManager::Implementation::callReading(const ServedClass& target
     const char* const slot = one ? "getInstance" : "enumerateInstances";
     const auto function = one ? table.getInstance : table.enumerateInstances;
     if (function == nullptr) {
-        return withoutSlot(*target.provider, slot);
+        return missingSlot(target.provider->name(), slot);
     }
     PropertyNames names(request.propertyList);
     const CMPIFlags flags = one ? 0 : CMPI_FLAG_DeepInheritance;
-    return callProvider(settings(request.principal, flags), Kind::instances, who + slot, path,
+    return callProvider(settings(request.principal, flags), sink, who + slot, path,
                         [&](const auto* context, const auto* result, const auto* op) {
                             return function(mi, context, result, op, names.pointer());
                         });
@@ -62,17 +83,17 @@ CallOutcome ObjectManager::Implementation::callModify(const ServedClass& target,
     Status status;
     CMPIInstanceMI* const mi = target.provider->instance(instance.path.nameSpace, status);
     if (mi == nullptr) {
-        return failed(std::move(status));
+        return {std::move(status)};
     }
     const auto function = mi->ft->modifyInstance;
     if (function == nullptr) {
-        return withoutSlot(*target.provider, "modifyInstance");
+        return missingSlot(target.provider->name(), "modifyInstance");
     }
     PropertyNames names(request.propertyList);
     // In memory of its own: that of the call begins and ends with the call.
     broker::Arena arena;
     const CMPIInstance* const changed = broker::toRecord(arena, &*schema_, instance);
-    return callProvider(settings(request.principal, 0), Kind::instances,
+    return callProvider(settings(request.principal, 0), nowhere(),
                         "provider " + target.provider->name() + ": modifyInstance", instance.path,
                         [&](const auto* context, const auto* result, const auto* op) {
                             return function(mi, context, result, op, changed, names.pointer());
@@ -80,64 +101,54 @@ CallOutcome ObjectManager::Implementation::callModify(const ServedClass& target,
 }
 
 ObjectManager::Implementation::Outcomes ObjectManager::Implementation::enumerate(
-    Reading reading, const ObjectPath& path, const InstanceRequest& request) {
+    Reading reading, const ObjectPath& path, const InstanceRequest& request, const Sink& sink) {
     Outcomes outcomes;
     const ServedClasses targets = servedInstances(path.className, path.nameSpace);
     outcomes.exact =
         targets.size() == 1 && sameName(targets.front()->declaration->name, path.className);
     for (const ServedClass* const target : targets) {
-        outcomes.calls.push_back(callReading(*target, reading, path, request));
+        outcomes.calls.push_back(callReading(*target, reading, path, request, sink));
     }
     return outcomes;
 }
 
-PathsResult ObjectManager::Implementation::enumerateInstanceNames(ObjectPath path,
-                                                                  const InstanceRequest& request) {
-    try {
-        if (Status status = canonical(path); !status.ok()) {
-            return {std::move(status), {}, 0};
-        }
-        return pathsFrom(enumerate(Reading::names, path, request), path.nameSpace);
-    } catch (const broker::ConversionError& error) {
-        return {{CMPI_RC_ERR_INVALID_PARAMETER, error.what()}, {}, 0};
-    }
+RequestEnd ObjectManager::Implementation::enumerateInstanceNames(ObjectPath path,
+                                                                 const InstanceRequest& request,
+                                                                 Receiver<ObjectPath>& receiver) {
+    return run(path, [&] {
+        return enumerate(Reading::names, path, request,
+                         sinkTo(receiver, path.nameSpace, std::nullopt, everything));
+    });
 }
 
-InstancesResult ObjectManager::Implementation::enumerateInstances(ObjectPath path,
-                                                                  const InstanceRequest& request) {
-    try {
-        if (Status status = canonical(path); !status.ok()) {
-            return {std::move(status), {}, 0};
-        }
-        InstancesResult result =
-            instancesFrom(enumerate(Reading::instances, path, request), path.nameSpace);
-        applyPropertyList(result, request.propertyList);
-        return result;
-    } catch (const broker::ConversionError& error) {
-        return {{CMPI_RC_ERR_INVALID_PARAMETER, error.what()}, {}, 0};
-    }
+RequestEnd ObjectManager::Implementation::enumerateInstances(ObjectPath path,
+                                                             const InstanceRequest& request,
+                                                             Receiver<Instance>& receiver) {
+    return run(path, [&] {
+        return enumerate(Reading::instances, path, request,
+                         sinkTo(receiver, path.nameSpace, request.propertyList, everything));
+    });
 }
 
 InstancesResult ObjectManager::Implementation::getFrom(const ServedClass& target,
                                                        const ObjectPath& path,
                                                        const InstanceRequest& request) {
-    Outcomes outcomes;
-    outcomes.exact = sameName(target.declaration->name, path.className);
-    outcomes.calls.push_back(callReading(target, Reading::one, path, request));
-    InstancesResult result = instancesFrom(std::move(outcomes), path.nameSpace);
+    FirstMatch match(path);
+    // Keys may be among the properties that the client does not want to see.
+    const std::optional<std::vector<std::string>> allProperties;
+    const Sink sink = sinkTo(match, path.nameSpace, allProperties, everything);
+    RequestEnd end = endOf({callReading(target, Reading::one, path, request, sink)},
+                           sameName(target.declaration->name, path.className));
+    InstancesResult result{std::move(end.status), {}, end.returnDoneCalls};
     if (!result.status.ok()) {
         return result;
     }
-    const auto found = std::find_if(
-        result.instances.begin(), result.instances.end(),
-        [&path](const auto& instance) { return instance && hasKeys(*instance, path); });
-    if (found == result.instances.end()) {
+    if (!match.found) {
         result.status = {CMPI_RC_ERR_NOT_FOUND, ""};
-        result.instances.clear();
         return result;
     }
-    std::swap(result.instances.front(), *found);
-    result.instances.resize(1);
+    applyPropertyList(*match.found, request.propertyList);
+    result.instances.push_back(std::move(match.found));
     return result;
 }
 
@@ -161,7 +172,6 @@ InstancesResult ObjectManager::Implementation::getInstance(ObjectPath path,
                 answer.returnDoneCalls = result.returnDoneCalls;
             }
             if (answer.status.ok()) {
-                applyPropertyList(answer, request.propertyList);
                 break;
             }
         }
@@ -193,12 +203,9 @@ InstancesResult ObjectManager::Implementation::modifyInstance(Instance instance,
                 continue;
             }
             instance.path.className = className;
-            Outcomes outcomes;
-            outcomes.exact = true;
-            outcomes.calls.push_back(callModify(*target, instance, request));
-            answer = instancesFrom(std::move(outcomes), wanted.nameSpace);
-            // Whatever the provider delivered: a modification has no result.
-            answer.instances.clear();
+            const CallOutcome outcome = callModify(*target, instance, request);
+            answer.status = outcome.status;
+            answer.returnDoneCalls = outcome.returnDoneCalls;
             return answer;
         }
         answer.status = {CMPI_RC_ERR_NOT_FOUND, ""};

@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <array>
+#include <utility>
 
 #include "ObjectManagerImplementation.h"
 #include "RequestPath.h"
@@ -146,14 +147,86 @@ const std::string& ObjectManager::host() const noexcept {
     return implementation_->host();
 }
 
+namespace {
+
+/// The result of a request that `ask` carries out with a receiver.
+template <typename Result, typename Object, typename Ask>
+Result collected(Ask&& ask) {
+    Collection<Object> collection;
+    RequestEnd end = std::forward<Ask>(ask)(collection);
+    if (!end.status.ok()) {
+        collection.objects.clear();
+    }
+    return {std::move(end.status), std::move(collection.objects), end.returnDoneCalls};
+}
+
+}  // namespace
+
 PathsResult ObjectManager::enumerateInstanceNames(const ObjectPath& path,
                                                   const InstanceRequest& request) {
-    return implementation_->enumerateInstanceNames(path, request);
+    return collected<PathsResult, ObjectPath>(
+        [&](auto& receiver) { return enumerateInstanceNames(path, request, receiver); });
+}
+
+RequestEnd ObjectManager::enumerateInstanceNames(const ObjectPath& path,
+                                                 const InstanceRequest& request,
+                                                 Receiver<ObjectPath>& receiver) {
+    return implementation_->enumerateInstanceNames(path, request, receiver);
 }
 
 InstancesResult ObjectManager::enumerateInstances(const ObjectPath& path,
                                                   const InstanceRequest& request) {
-    return implementation_->enumerateInstances(path, request);
+    return collected<InstancesResult, Instance>(
+        [&](auto& receiver) { return enumerateInstances(path, request, receiver); });
+}
+
+RequestEnd ObjectManager::enumerateInstances(const ObjectPath& path, const InstanceRequest& request,
+                                             Receiver<Instance>& receiver) {
+    return implementation_->enumerateInstances(path, request, receiver);
+}
+
+PathsResult ObjectManager::associatorNames(const ObjectPath& path,
+                                           const AssociationRequest& request) {
+    return collected<PathsResult, ObjectPath>(
+        [&](auto& receiver) { return associatorNames(path, request, receiver); });
+}
+
+RequestEnd ObjectManager::associatorNames(const ObjectPath& path, const AssociationRequest& request,
+                                          Receiver<ObjectPath>& receiver) {
+    return implementation_->associatorNames(path, request, receiver);
+}
+
+InstancesResult ObjectManager::associators(const ObjectPath& path,
+                                           const AssociationRequest& request) {
+    return collected<InstancesResult, Instance>(
+        [&](auto& receiver) { return associators(path, request, receiver); });
+}
+
+RequestEnd ObjectManager::associators(const ObjectPath& path, const AssociationRequest& request,
+                                      Receiver<Instance>& receiver) {
+    return implementation_->associators(path, request, receiver);
+}
+
+PathsResult ObjectManager::referenceNames(const ObjectPath& path,
+                                          const AssociationRequest& request) {
+    return collected<PathsResult, ObjectPath>(
+        [&](auto& receiver) { return referenceNames(path, request, receiver); });
+}
+
+RequestEnd ObjectManager::referenceNames(const ObjectPath& path, const AssociationRequest& request,
+                                         Receiver<ObjectPath>& receiver) {
+    return implementation_->referenceNames(path, request, receiver);
+}
+
+InstancesResult ObjectManager::references(const ObjectPath& path,
+                                          const AssociationRequest& request) {
+    return collected<InstancesResult, Instance>(
+        [&](auto& receiver) { return references(path, request, receiver); });
+}
+
+RequestEnd ObjectManager::references(const ObjectPath& path, const AssociationRequest& request,
+                                     Receiver<Instance>& receiver) {
+    return implementation_->references(path, request, receiver);
 }
 
 InstancesResult ObjectManager::getInstance(const ObjectPath& path, const InstanceRequest& request) {
@@ -163,26 +236,6 @@ InstancesResult ObjectManager::getInstance(const ObjectPath& path, const Instanc
 InstancesResult ObjectManager::modifyInstance(const Instance& instance,
                                               const InstanceRequest& request) {
     return implementation_->modifyInstance(instance, request);
-}
-
-PathsResult ObjectManager::associatorNames(const ObjectPath& path,
-                                           const AssociationRequest& request) {
-    return implementation_->associatorNames(path, request);
-}
-
-InstancesResult ObjectManager::associators(const ObjectPath& path,
-                                           const AssociationRequest& request) {
-    return implementation_->associators(path, request);
-}
-
-PathsResult ObjectManager::referenceNames(const ObjectPath& path,
-                                          const AssociationRequest& request) {
-    return implementation_->referenceNames(path, request);
-}
-
-InstancesResult ObjectManager::references(const ObjectPath& path,
-                                          const AssociationRequest& request) {
-    return implementation_->references(path, request);
 }
 
 }  // namespace cimom

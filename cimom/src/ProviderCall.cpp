@@ -65,17 +65,24 @@ Status checkDepth() {
                                     std::to_string(deepest) + " deep"};
 }
 
-CallOutcome finished(Status status, broker::ResultCollector& collector) {
-    CallOutcome outcome{std::move(status), collector.take()};
-    if (!outcome.status.ok()) {
-        if (outcome.status.message.empty()) {
-            outcome.status.message = outcome.delivery.errorMessage;
+CallOutcome missingSlot(const std::string& provider, const char* slot) {
+    return {{CMPI_RC_ERR_NOT_SUPPORTED, "provider " + provider + " does not offer " + slot}};
+}
+
+CallOutcome finished(Status status, broker::ResultCollector& collector, const Sink& sink,
+                     std::size_t mark) {
+    if (const std::exception_ptr failure = collector.failure()) {
+        std::rethrow_exception(failure);
+    }
+    broker::Delivery delivery = collector.take();
+    if (!status.ok()) {
+        if (status.message.empty()) {
+            status.message = std::move(delivery.errorMessage);
         }
         // What came before an error is no answer.
-        outcome.delivery.paths.clear();
-        outcome.delivery.instances.clear();
+        sink.backTo(mark);
     }
-    return outcome;
+    return {std::move(status), delivery.returnDoneCalls};
 }
 
 }  // namespace cimom

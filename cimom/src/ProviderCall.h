@@ -3,7 +3,9 @@
 #include <cmpift.h>
 #include <cxxabi.h>
 
+#include <cstddef>
 #include <exception>
+#include <functional>
 #include <optional>
 #include <string>
 #include <utility>
@@ -49,6 +51,14 @@ class PropertyNames {
     std::vector<const char*> pointers_;
 };
 
+/// Where the objects of a request's calls go.
+struct Sink {
+    broker::ResultCollector::Kind kind;
+    broker::Consumer consumer;
+    std::function<std::size_t()> mark;
+    std::function<void(std::size_t)> backTo;  ///< as those of a Receiver
+};
+
 /// What is the same for all calls of one request.
 struct CallSettings {
     const broker::Schema* schema;
@@ -56,30 +66,37 @@ struct CallSettings {
     CMPIFlags flags = 0;
 };
 
-/// What came of one call. After an error nothing is delivered.
+/// What came of one call, beside the objects that it delivered. After an error
+/// there are none.
 struct CallOutcome {
     Status status;
-    broker::Delivery delivery;
+    unsigned returnDoneCalls = 0;
 };
+
+[[nodiscard]] CallOutcome missingSlot(const std::string& provider, const char* slot);
 
 /// The status when a request is nested too deep; OK otherwise.
 [[nodiscard]] Status checkDepth();
 
-/// Takes what was delivered; after an error nothing counts but its message.
-[[nodiscard]] CallOutcome finished(Status status, broker::ResultCollector& collector);
+/// The end of a call that began when the sink was at `mark`: after an error nothing
+/// counts but its message. Throws what the sink has thrown.
+[[nodiscard]] CallOutcome finished(Status status, broker::ResultCollector& collector,
+                                   const Sink& sink, std::size_t mark);
 
 /// One call of a provider's slot, with everything that it needs: memory, context,
 /// result and object path. `invoke` gets those as (context, result, path)
 /// and gives a CMPIStatus. Too deep a nesting of requests is an
-/// error status. Throws broker::ConversionError for a path that cannot be handed over.
+/// error status. Throws broker::ConversionError for a path that cannot be handed
+/// over, and what the sink throws.
 template <typename Invoke>
-CallOutcome callProvider(const CallSettings& settings, broker::ResultCollector::Kind kind,
-                         const std::string& who, const ObjectPath& path, Invoke&& invoke) {
+CallOutcome callProvider(const CallSettings& settings, const Sink& sink, const std::string& who,
+                         const ObjectPath& path, Invoke&& invoke) {
     if (Status tooDeep = checkDepth(); !tooDeep.ok()) {
-        return {std::move(tooDeep), {}};
+        return {std::move(tooDeep)};
     }
     broker::RequestScope scope;
-    broker::ResultCollector collector(kind);
+    broker::ResultCollector collector(sink.kind, &sink.consumer);
+    const std::size_t mark = sink.mark();
     broker::Arena& arena = scope.arena();
     const CMPIContext* const context =
         broker::makeContext(arena, path.nameSpace, settings.principal, settings.flags,
@@ -87,7 +104,7 @@ CallOutcome callProvider(const CallSettings& settings, broker::ResultCollector::
     const CMPIObjectPath* const record = broker::toRecord(arena, settings.schema, path);
     Status status = guardedCall(
         who, [&] { return std::forward<Invoke>(invoke)(context, collector.record(), record); });
-    return finished(std::move(status), collector);
+    return finished(std::move(status), collector, sink, mark);
 }
 
 }  // namespace cimom

@@ -104,6 +104,13 @@ TEST_F(CommandLineText, TakesArgumentsThatLookLikeCommandsOrOptions) {
               Command(RenameCommand{"eth0", "\"quoted\" 'name'", false}));
 }
 
+TEST_F(CommandLineText, AnEmptyValueBehindAnEqualsSignIsNotTheNextArgument) {
+    EXPECT_EQ(refusal({"--tree=", "show"}), "--tree needs a name");
+    EXPECT_EQ(line({"--provider-dir=", "show"}).options.providerDir, "");
+    EXPECT_EQ(std::get<AssociatorsCommand>(line({"associators", "--role=", "P"}).command).role, "");
+    EXPECT_EQ(std::get<GetCommand>(line({"get", "--", "--tree="}).command).path, "--tree=");
+}
+
 TEST_F(CommandLineText, ReadsTheCommandsOfTheServer) {
     EXPECT_EQ(line({"serve"}).command, Command(ServeCommand()));
     ServeCommand serve;
@@ -142,7 +149,7 @@ TEST_F(CommandLineText, TellsWhatIsWrong) {
     EXPECT_EQ(refusal({"serve", "--max-body", "0"}), "--max-body is 0; it may be 1 to 1073741824");
     EXPECT_NE(refusal({"serve", "--request-timeout", "x"}), "accepted");
     EXPECT_EQ(refusal({"show", "eth0"}), "The following argument was not expected: eth0" + hint);
-    EXPECT_EQ(refusal({"--connect", "x", "show"}).substr(0, 37),
+    EXPECT_EQ(refusal({"--nothing", "x", "show"}).substr(0, 37),
               "The following arguments were not expe");
     EXPECT_EQ(refusal({"rename", "eth0"}), "NAME is required" + hint);
     EXPECT_EQ(refusal({"modify", "P"}), "PROPERTY=VALUE is required" + hint);
@@ -186,6 +193,18 @@ TEST_F(CommandLineText, HelpNamesEveryCommandAndOption) {
                              "--data-dir DIR",
                              "--namespace NS",
                              "--format FORMAT",
+                             "--connect URL",
+                             "--hosts FILE",
+                             "--parallel N",
+                             "--timeout SECONDS",
+                             "--credentials FILE",
+                             "--cacert FILE",
+                             "--insecure",
+                             "--no-header",
+                             "--sort COLUMN",
+                             "--count",
+                             "--time",
+                             "--color WHEN",
                              "--schema-dir DIR",
                              "--registration-dir DIR",
                              "--provider-dir DIR",

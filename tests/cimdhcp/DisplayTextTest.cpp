@@ -14,6 +14,7 @@ TEST(DisplayText, KeepsPrintableText) {
 TEST(DisplayText, EscapesWhatCouldSteerATerminal) {
     EXPECT_EQ(printable("a\x1B[31mb\n\x7F"), "a\\x1B[31mb\\x0A\\x7F");
     EXPECT_EQ(printable("\xC2\x9B"), "\\u009B");
+    EXPECT_EQ(printable(std::string_view("a\0b", 3)), "a\\x00b");
 }
 
 TEST(DisplayText, EscapesBytesThatAreNoUtf8) {
@@ -31,6 +32,7 @@ TEST(DisplayText, CutsOnlyWhatDoesNotFit) {
     EXPECT_EQ(cutToWidth("abcdefg", 6), "abcde…");
     EXPECT_EQ(cutToWidth("東京市", 5), "東京…");
     EXPECT_EQ(cutToWidth("ab", 1), "…");
+    EXPECT_EQ(cutToWidth("東京", 2), "…");
 }
 
 TEST(DisplayText, WrapsAtBlanks) {

@@ -45,6 +45,11 @@ TEST(JsonFormat, HasAllPartsInTheirOrder) {
 )");
 }
 
+TEST(JsonFormat, AServerDoesNotTellAboutItsProvider) {
+    EXPECT_NE(asJson({"GetInstance", {}, std::nullopt, {}, {}}).find("\"returnDone\": null"),
+              std::string::npos);
+}
+
 TEST(JsonFormat, HasInstancesWithTheirProperties) {
     cimom::Instance instance;
     instance.path = cimom::parseObjectPath("root/cimv2:TEST_Base.Id=\"a\"");

@@ -52,6 +52,28 @@ cimom::Instance setting(const std::string& id, const std::string& configuration)
 constexpr const char* host = "QVXZR_ComputerSystem";
 constexpr const char* processor = "QVXZR_SPComputerSystem";
 
+cimom::Instance ipEndpoint(const std::string& system, const std::string& name,
+                           const std::string& address) {
+    cimom::Instance instance;
+    instance.properties = {{"SystemName", Value::ofString(system)},
+                           {"Name", Value::ofString(name)},
+                           {"IPv4Address", Value::ofString(address)}};
+    return instance;
+}
+
+TEST(InterfacesOfAnotherMachine, AreThoseThatHaveASetting) {
+    EXPECT_EQ(interfacesOf({setting("Computer%eth0", "office"), setting("Computer%eth%1", ""),
+                            setting("BMC%eth0", ""), setting("nothing", "")},
+                           {ipEndpoint("host", "eth0", "192.0.2.17"),
+                            ipEndpoint("BMC:-1", "eth0", "192.0.2.18"),
+                            ipEndpoint("host", "eth9", "192.0.2.19")},
+                           {"BMC:-1"}),
+              (std::vector<InterfaceOverview>{
+                  {"Computer", "eth0", std::nullopt, "", "192.0.2.17", {}, ""},
+                  {"Computer", "eth%1", std::nullopt, "", "", {}, ""},
+                  {"BMC", "eth0", std::nullopt, "", "192.0.2.18", {}, ""}}));
+}
+
 class MachineOverview : public ::testing::Test {
   protected:
     MachineOverview() { repository_.loadText(schema, "small.mof"); }

@@ -86,5 +86,12 @@ TEST(RemarkLine, IsOneLineOrNone) {
               "cimdhcp: not everything could be read: a; b; c; d; and 2 more, told in the log\n");
 }
 
+TEST(Overview, WithoutHeadingsIsRowsAlone) {
+    const Style bare{false, false};
+    EXPECT_EQ(overviewTable({}, std::nullopt, bare), "");
+    EXPECT_EQ(overviewTable({{"Computer", "eth0", false, "", "", {}, ""}}, std::nullopt, bare),
+              "eth0  off  -  -  -  -\n");
+}
+
 }  // namespace
 }  // namespace cimdhcp

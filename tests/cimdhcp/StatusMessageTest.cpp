@@ -39,5 +39,12 @@ TEST(StatusMessage, IsOneLine) {
     EXPECT_EQ(messageOf(CMPI_RC_ERR_FAILED, "two\nlines"), "CIM_ERR_FAILED: two\\x0Alines");
 }
 
+TEST(StatusName, KnowsThoseThatOnlyServersGive) {
+    EXPECT_EQ(statusNameOf({CMPI_RC_OK, ""}), "OK");
+    EXPECT_EQ(statusNameOf({CMPI_RC_ERR_NOT_FOUND, ""}), "CIM_ERR_NOT_FOUND");
+    EXPECT_EQ(statusNameOf({static_cast<CMPIrc>(28), ""}), "CIM_ERR_SERVER_IS_SHUTTING_DOWN");
+    EXPECT_EQ(statusNameOf({static_cast<CMPIrc>(200), ""}), "CIM_ERR_FAILED");
+}
+
 }  // namespace
 }  // namespace cimdhcp

@@ -21,6 +21,20 @@ TEST(Table, AlignsColumnsAndLeavesNoBlanksAtLineEnds) {
               "longer  a rather long value\n");
 }
 
+TEST(Table, MayBeWithoutHeadings) {
+    EXPECT_EQ(Table({"A LONG HEADING", "B"}).text(std::nullopt, {false, false}), "");
+    Table table({"A LONG HEADING", "B"});
+    table.add({"a", "b"});
+    EXPECT_EQ(table.text(std::nullopt, {false, false}), "a  b\n");
+}
+
+TEST(Table, ColorsItsHeadings) {
+    EXPECT_EQ(sample().text(20, {true, true}),
+              "\x1B[1mNAME    VALUE\x1B[0m\n"
+              "a       short\n"
+              "longer  a rather lo…\n");
+}
+
 TEST(Table, CutsTheWidestColumnToFit) {
     EXPECT_EQ(sample().text(20),
               "NAME    VALUE\n"

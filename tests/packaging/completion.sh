@@ -31,13 +31,19 @@ completes 'add' user a
 completes '--users' user add --us
 completes 'table' --format ta
 completes '--format' --fo
+completes '--connect --count --color' --co
+completes 'always' --color al
+completes 'state' show --sort st
+completes 'PATH' instances QVXZR_DHCPCapabilities --sort ''
+completes '' --connect localhost --timeout ''
+completes 'show serve' --parallel 3 --hosts file s
 completes 'QVXZR_DHCPSettingData' names QVXZR_DHCPS
 completes 'QVXZR_DHCPProtocolEndpoint' --format json instances QVXZR_DHCPP
 completes 'QVXZR_SAPSAPDependency' associators --assoc-class QVXZR_SAP
 completes 'eth0 eth1' rename eth
 completes '' rename eth0 of
-completes '--create' rename --cr
-completes '--schema-dir --svg' graph --s
+completes '--create' rename --crea
+completes '--sort --schema-dir --svg' graph --s
 completes "$3" --tree "${3%.json}"
 completes '--registration-dir --result-class --role --result-role' associators --r
 exit $((failures > 0))

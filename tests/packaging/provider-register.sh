@@ -83,8 +83,103 @@ class TEST_Thing {};
 TEXT
 content "$stage" >"$directory/content"
 check "serves the files and namespaces that are named" diff "$directory/wanted" "$directory/content"
+DESTDIR=$stage "$program" -t sfcb -d -r "$directory/one.registration" -m "$directory/things.mof" "$directory/others.mof"
+check "taking out what is named leaves nothing" test -z "$(find "$stage" -mindepth 1)"
 DESTDIR=$stage "$program" -t sfcb -n root/c -r "$directory/one.registration" -m "$directory/things.mof"
-check "-n counts before the registration" grep -q 'namespace: root/c$' "$stage/var/lib/sfcb/stage/regs/Things.reg"
+cat >"$directory/wanted" <<'TEXT'
+== ./var/lib/sfcb/stage/mofs/root/c/things.mof
+class TEST_Thing {};
+== ./var/lib/sfcb/stage/regs/Things.reg
+[TEST_Thing]
+   provider: Things
+   location: ThingsLibrary
+   type: instance association
+   namespace: root/c
+TEXT
+content "$stage" >"$directory/content"
+check "-n counts before the registration" diff "$directory/wanted" "$directory/content"
+
+# What it says.
+told() { # NAME ARGUMENTS... compares what is said below DESTDIR with standard input
+    local name=$1
+    shift
+    (cd "$directory" && DESTDIR=stage "$program" "$@" 2>&1) >"$directory/said" || true
+    check "$name" diff - "$directory/said"
+}
+things=(-r "$directory/one.registration" -m "$directory/things.mof" -n root/c)
+told "says what it registers with -v" -v -t sfcb "${things[@]}" <<'TEXT'
+written: stage/var/lib/sfcb/stage/regs/Things.reg
+written: stage/var/lib/sfcb/stage/mofs/root/c/things.mof
+not run below DESTDIR: sfcbrepos -f
+TEXT
+told "says with -v that a second run changes nothing" -v -t sfcb "${things[@]}" <<'TEXT'
+unchanged: stage/var/lib/sfcb/stage/regs/Things.reg
+unchanged: stage/var/lib/sfcb/stage/mofs/root/c/things.mof
+TEXT
+told "says what it takes out with -v" -v -d -t sfcb "${things[@]}" <<'TEXT'
+removed: stage/var/lib/sfcb/stage/regs/Things.reg
+removed: stage/var/lib/sfcb/stage/mofs/root/c/things.mof
+not run below DESTDIR: sfcbrepos -f
+TEXT
+told "says nothing without -v" -t pegasus "${things[@]}" <<'TEXT'
+TEXT
+told "says what it takes out of OpenPegasus with -v" -v -d -t pegasus "${things[@]}" <<'TEXT'
+removed: stage/var/lib/dhcp-client-provider/pegasus/Things.mof
+not run below DESTDIR: cimprovider -d -m ThingsModule
+not run below DESTDIR: cimprovider -r -m ThingsModule
+removed: stage/var/lib/dhcp-client-provider/pegasus/root/c/things.mof
+TEXT
+check "leaves nothing" test -z "$(find "$directory/stage" -mindepth 1)"
+for option in -h --help; do
+    told "prints its options with $option" "$option" <<'TEXT'
+Usage: provider-register.sh [-t pegasus|sfcb] [-n NAMESPACE] [-r FILE...] [-m FILE...] [-d] [-v]
+
+Registers CMPI providers with an object manager, or takes them out again.
+
+  -t TYPE       pegasus or sfcb; the one that is installed when not given
+  -n NAMESPACE  the namespace to serve instead of the one in the registration
+  -r FILE...    registration files; those of this package when not given
+  -m FILE...    MOF files; those of this package when not given
+  -d            take the providers out
+  -v            say what is done
+  -h            print this help
+
+With the variable DESTDIR, everything happens below that directory, and no program
+of the object manager is called. A second run with the same arguments changes nothing.
+TEXT
+done
+
+# Without -t, it is the object manager whose programs are there.
+found() { # PROGRAMS-OF-OBJECT-MANAGERS
+    rm -rf "$directory/found"
+    mkdir "$directory/found"
+    local name
+    for name in $1; do
+        printf '#!/bin/sh\n' >"$directory/found/$name"
+        chmod +x "$directory/found/$name"
+    done
+}
+PATH=$directory/found:$PATH
+found sfcbrepos
+told "finds SFCB" -v "${things[@]}" <<'TEXT'
+object manager: sfcb
+written: stage/var/lib/sfcb/stage/regs/Things.reg
+written: stage/var/lib/sfcb/stage/mofs/root/c/things.mof
+not run below DESTDIR: sfcbrepos -f
+TEXT
+told "finds SFCB to take out, too" -d "${things[@]}" <<'TEXT'
+TEXT
+check "leaves nothing" test -z "$(find "$directory/stage" -mindepth 1)"
+found ''
+told "finds none" "${things[@]}" <<'TEXT'
+provider-register.sh: no object manager is installed that this program knows; name one with -t
+TEXT
+found 'sfcbrepos cimmof'
+told "finds two" "${things[@]}" <<'TEXT'
+provider-register.sh: more than one object manager is installed; choose one with -t
+TEXT
+check "writes nothing then" test -z "$(find "$directory/stage" -mindepth 1)"
+found ''
 
 # The object manager is found by its programs, which are then called.
 mkdir "$directory/bin"
@@ -127,8 +222,5 @@ printf '[TEST_Thing]\nprovider: A"; rm\n' >"$directory/wrong.registration"
 refused 1 'no value for provider' -t sfcb -r "$directory/wrong.registration"
 printf '[TEST_Thing]\ntype: indication\n' >"$directory/wrong.registration"
 refused 1 'unknown type indication' -t sfcb -r "$directory/wrong.registration"
-
-"$program" -h >"$directory/help"
-check "-h prints the options" grep -q -- '-n NAMESPACE' "$directory/help"
 
 exit $((failures > 0))

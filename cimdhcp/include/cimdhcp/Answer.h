@@ -13,7 +13,7 @@ namespace cimdhcp {
 struct Answer {
     std::string operation;  ///< as DSP0200 names it, e.g. "EnumerateInstances"
     cimom::Status status;
-    unsigned returnDoneCalls = 0;
+    std::optional<unsigned> returnDoneCalls = 0;  ///< none: a server does not tell
     std::vector<std::optional<cimom::ObjectPath>> paths;
     std::vector<std::optional<cimom::Instance>> instances;
 

@@ -5,6 +5,8 @@
 #include <string>
 #include <vector>
 
+#include "cimdhcp/Columns.h"
+#include "cimdhcp/Style.h"
 #include "cimom/ClassRepository.h"
 #include "cimom/ObjectManager.h"
 
@@ -15,7 +17,7 @@ struct ClassEntry {
     std::string name;
     std::string superclass;  ///< empty: none
     bool association = false;
-    std::string provider;
+    std::string provider;  ///< empty: not known
     std::vector<std::string> nameSpaces;
 
     bool operator==(const ClassEntry&) const = default;
@@ -27,8 +29,10 @@ struct ClassEntry {
     const std::vector<cimom::Registration>& registrations,
     const cimom::ClassRepository& repository);
 
+[[nodiscard]] const std::vector<Column<ClassEntry>>& classColumns();
+
 [[nodiscard]] std::string classTable(const std::vector<ClassEntry>& classes,
-                                     std::optional<std::size_t> width);
+                                     std::optional<std::size_t> width, const Style& style = {});
 
 /// {"classes": [{"class", "superclass", "kind", "provider", "namespaces"}]}
 [[nodiscard]] std::string classJson(const std::vector<ClassEntry>& classes);

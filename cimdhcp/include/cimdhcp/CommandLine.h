@@ -1,11 +1,14 @@
 #pragma once
 
+#include <chrono>
+#include <cstddef>
 #include <cstdint>
 #include <optional>
 #include <string>
 #include <variant>
 #include <vector>
 
+#include "cimdhcp/Style.h"
 #include "wbem/Limits.h"
 
 namespace cimdhcp {
@@ -21,6 +24,24 @@ struct Options {
     std::optional<std::string> schemaDir;
     std::optional<std::string> registrationDir;
     std::optional<std::string> providerDir;
+
+    // The servers that are asked in place of the object manager of this process.
+    std::vector<std::string> connect;  ///< URLs or hosts
+    std::optional<std::string> hosts;  ///< a file of them; "-": standard input
+    std::size_t parallel = 16;         ///< how many servers are asked at the same time
+    std::chrono::seconds timeout{30};  ///< for all that is asked of one server
+    std::optional<std::string> caCertificate;
+    bool insecure = false;
+    std::optional<std::string> credentials;
+
+    // How the answer is shown.
+    bool noHeader = false;
+    std::optional<std::string> sort;
+    bool count = false;
+    bool time = false;
+    ColorMode color = ColorMode::automatic;
+
+    [[nodiscard]] bool remote() const noexcept { return !connect.empty() || hosts; }
 
     bool operator==(const Options&) const = default;
 };

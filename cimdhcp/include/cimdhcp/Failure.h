@@ -8,9 +8,11 @@ namespace cimdhcp {
 /// How the program ends.
 enum class ExitStatus : int {
     ok = 0,
-    notDone = 1,    ///< the CIM status is another than OK, or a rename was not possible
-    usage = 2,      ///< the command line cannot be understood
-    notLoaded = 3,  ///< the provider or a file cannot be loaded, or the output not written
+    notDone = 1,        ///< the CIM status is another than OK, or a rename was not possible
+    usage = 2,          ///< the command line cannot be understood
+    notLoaded = 3,      ///< the provider or a file cannot be loaded, or the output not written
+    notAllDone = 4,     ///< some of several servers have failed
+    interrupted = 130,  ///< as shells call the end by SIGINT
 };
 
 /// Ends the command. what() is one line for the person at the keyboard, with a

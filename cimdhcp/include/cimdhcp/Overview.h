@@ -6,7 +6,9 @@
 #include <string>
 #include <vector>
 
+#include "cimdhcp/Columns.h"
 #include "cimdhcp/MachineOverview.h"
+#include "cimdhcp/Style.h"
 
 namespace cimdhcp {
 
@@ -14,7 +16,10 @@ namespace cimdhcp {
 /// that line alone when there are none. The system stands in a column of its own
 /// when not all of them are the host's.
 [[nodiscard]] std::string overviewTable(const std::vector<InterfaceOverview>& interfaces,
-                                        std::optional<std::size_t> width);
+                                        std::optional<std::size_t> width, const Style& style = {});
+
+/// All columns, that of the system first.
+[[nodiscard]] const std::vector<Column<InterfaceOverview>>& overviewColumns();
 
 /// {"interfaces": [{"interface", "system", "dhcp", "state", "address", "servers",
 /// "configurationName"}]}; what is not known is null.

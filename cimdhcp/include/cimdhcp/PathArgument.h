@@ -2,8 +2,8 @@
 
 #include <string>
 
+#include "cimdhcp/ClassLookup.h"
 #include "cimom/Cim.h"
-#include "cimom/ClassRepository.h"
 
 namespace cimdhcp {
 
@@ -15,6 +15,6 @@ namespace cimdhcp {
 /// in the path: without any it would name a class. Throws Failure.
 [[nodiscard]] cimom::ObjectPath readPathArgument(const std::string& text,
                                                  const std::string& defaultNamespace,
-                                                 const cimom::ClassRepository& repository);
+                                                 const ClassLookup& classes);
 
 }  // namespace cimdhcp

@@ -13,6 +13,8 @@ struct Outputs {
     std::ostream& out;
     std::ostream& err;
     std::optional<std::size_t> width;  ///< of a terminal behind `out`; none: it is no terminal
+    /// The same of `err`.
+    std::optional<std::size_t> errWidth = std::nullopt;
 };
 
 /// Runs the program with the arguments behind its name; answers its exit status.

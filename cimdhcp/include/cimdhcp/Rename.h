@@ -10,7 +10,7 @@ namespace cimdhcp {
 /// What a rename did.
 struct RenameReport {
     std::string interfaceName;
-    std::string file;  ///< the interface's configuration file
+    std::string file;  ///< the interface's configuration file; empty: on another machine
     std::string dataDir;
     bool directoryCreated = false;
     bool fileCreated = false;
@@ -21,16 +21,16 @@ struct RenameReport {
 };
 
 /// Changes the configuration name of an interface through the provider, and reads
-/// it back: what it answers has happened. `dataDir` ends with "/". The interface may
-/// be given as the setting's InstanceID ("BMC%eth1"), too, which tells interfaces of
-/// one name apart. Throws Failure.
-[[nodiscard]] RenameReport rename(const RenameCommand& command, const std::string& dataDir,
-                                  Client& client);
+/// it back: what it answers has happened. The interface may be given as the setting's
+/// InstanceID ("BMC%eth1"), too, which tells interfaces of one name apart. The files
+/// of another machine can be neither seen nor made. Throws Failure.
+[[nodiscard]] RenameReport rename(const RenameCommand& command, Client& client);
 
 [[nodiscard]] std::string renameText(const RenameReport& report);
 
 /// {"operation": "rename", "interface", "file", "fileCreated", "directoryCreated",
-/// "oldName", "newName"}; an old name that there was not is null.
+/// "oldName", "newName"}; an old name that there was not is null, as is the file of another
+/// machine.
 [[nodiscard]] std::string renameJson(const RenameReport& report);
 
 }  // namespace cimdhcp

@@ -5,8 +5,8 @@
 #include <ostream>
 #include <string>
 
-#include "cimdhcp/Client.h"
 #include "cimdhcp/CommandLine.h"
+#include "cimdhcp/EmbeddedClient.h"
 
 namespace cimdhcp {
 
@@ -24,6 +24,6 @@ struct Listening {
 /// Runs the WBEM server until the process gets SIGTERM or SIGINT, which it blocks
 /// in this thread. Prints one line when the server can be asked. What it tells goes
 /// to the logging service. Throws Failure when the server cannot start.
-void serve(const ServeCommand& command, Client& client, std::ostream& out);
+void serve(const ServeCommand& command, EmbeddedClient& client, std::ostream& out);
 
 }  // namespace cimdhcp

@@ -5,6 +5,8 @@
 #include <string>
 #include <vector>
 
+#include "cimdhcp/Style.h"
+
 namespace cimdhcp {
 
 /// Rows of cells below headings, in aligned columns with two blanks between them.
@@ -18,7 +20,7 @@ class Table {
     /// The lines of the table, without blanks at their ends. With a width, the
     /// widest columns are cut until the lines fit into it, though never below four
     /// columns each.
-    [[nodiscard]] std::string text(std::optional<std::size_t> width) const;
+    [[nodiscard]] std::string text(std::optional<std::size_t> width, const Style& style = {}) const;
 
   private:
     std::vector<std::vector<std::string>> rows_;  ///< the first are the headings

@@ -5,7 +5,8 @@
 #include <string>
 
 #include "cimdhcp/Answer.h"
-#include "cimom/ClassRepository.h"
+#include "cimdhcp/ClassLookup.h"
+#include "cimdhcp/Style.h"
 
 namespace cimdhcp {
 
@@ -13,7 +14,7 @@ namespace cimdhcp {
 /// path and below it "Property = value (meaning)", aligned; properties that are
 /// null are left out. With a width, long values go on in further lines. Paths are
 /// never broken, so that they can be copied.
-[[nodiscard]] std::string asTable(const Answer& answer, const cimom::ClassRepository& repository,
-                                  std::optional<std::size_t> width);
+[[nodiscard]] std::string asTable(const Answer& answer, const ClassLookup& classes,
+                                  std::optional<std::size_t> width, const Style& style = {});
 
 }  // namespace cimdhcp

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstddef>
 #include <filesystem>
 #include <memory>
 #include <optional>
@@ -69,6 +70,31 @@ struct InstancesResult {
     unsigned returnDoneCalls = 0;
 };
 
+/// How a request ended whose objects went to a receiver.
+struct RequestEnd {
+    Status status;
+    unsigned returnDoneCalls = 0;
+};
+
+/// Gets the objects of a result one after the other, so that nobody has to hold
+/// them all. One thread at a time calls it, while the provider delivers. What it
+/// throws leaves the request, once the provider has returned.
+template <typename Object>
+class Receiver {
+  public:
+    Receiver() = default;
+    virtual ~Receiver() = default;
+    Receiver(const Receiver&) = delete;
+    Receiver& operator=(const Receiver&) = delete;
+
+    /// Absent: the provider delivered null.
+    virtual void take(std::optional<Object> object) = 0;
+    /// A name for what it has now.
+    [[nodiscard]] virtual std::size_t mark() = 0;
+    /// Forgets what came since that mark: a provider's call failed in the end.
+    virtual void backTo(std::size_t mark) = 0;
+};
+
 /// Loads CMPI 2.0 providers and carries requests to them. Safe for concurrent
 /// requests. It knows CIM and CMPI, and nothing about what providers serve.
 ///
@@ -100,11 +126,27 @@ class ObjectManager {
     InstancesResult getInstance(const ObjectPath& path, const InstanceRequest& request = {});
     InstancesResult modifyInstance(const Instance& instance, const InstanceRequest& request = {});
 
+    // The same for results of any size. When the status at the end is an error, what
+    // the receiver has got is no answer.
+    RequestEnd enumerateInstanceNames(const ObjectPath& path, const InstanceRequest& request,
+                                      Receiver<ObjectPath>& receiver);
+    RequestEnd enumerateInstances(const ObjectPath& path, const InstanceRequest& request,
+                                  Receiver<Instance>& receiver);
+
     // Associations of the object that the path names.
     PathsResult associatorNames(const ObjectPath& path, const AssociationRequest& request = {});
     InstancesResult associators(const ObjectPath& path, const AssociationRequest& request = {});
     PathsResult referenceNames(const ObjectPath& path, const AssociationRequest& request = {});
     InstancesResult references(const ObjectPath& path, const AssociationRequest& request = {});
+
+    RequestEnd associatorNames(const ObjectPath& path, const AssociationRequest& request,
+                               Receiver<ObjectPath>& receiver);
+    RequestEnd associators(const ObjectPath& path, const AssociationRequest& request,
+                           Receiver<Instance>& receiver);
+    RequestEnd referenceNames(const ObjectPath& path, const AssociationRequest& request,
+                              Receiver<ObjectPath>& receiver);
+    RequestEnd references(const ObjectPath& path, const AssociationRequest& request,
+                          Receiver<Instance>& receiver);
 
   private:
     class Implementation;

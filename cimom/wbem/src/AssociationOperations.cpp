@@ -40,7 +40,8 @@ Question questionOf(Request& request, Kind kind, Result result) {
     return question;
 }
 
-Answer classesAnswer(Request& request, const Question& question, Kind kind, Result result) {
+Answer classAssociationsAnswer(Request& request, const Question& question, Kind kind,
+                               Result result) {
     const ClassDeclaration& source =
         requireClass(request, question.object.path.className, CimStatus::invalidClass);
     const ClassRepository& repository = request.manager.repository();
@@ -49,7 +50,7 @@ Answer classesAnswer(Request& request, const Question& question, Kind kind, Resu
                        : associationClasses(source, question.filter, repository);
     const ClassForm form{false, question.qualifiers, question.classOrigin,
                          question.filter.propertyList};
-    return listAnswer(
+    return classesAnswer(
         request.call, std::move(classes),
         [form, result, host = request.manager.host(), nameSpace = request.call.nameSpace](
             std::string& out, const ClassDeclaration* declaration) {
@@ -66,39 +67,48 @@ Answer classesAnswer(Request& request, const Question& question, Kind kind, Resu
 Answer objectsAnswer(Request& request, Kind kind) {
     const Question question = questionOf(request, kind, Result::objects);
     if (question.object.isClass) {
-        return classesAnswer(request, question, kind, Result::objects);
+        return classAssociationsAnswer(request, question, kind, Result::objects);
     }
-    auto result = kind == Kind::associators
-                      ? request.manager.associators(question.object.path, question.filter)
-                      : request.manager.references(question.object.path, question.filter);
-    requireOk(result.status);
     const ClassRepository* const origins =
         question.classOrigin ? &request.manager.repository() : nullptr;
-    return listAnswer(
-        request.call, present(std::move(result.instances)),
-        [origins, host = request.manager.host()](std::string& out, const Instance& instance) {
-            out += "<VALUE.OBJECTWITHPATH>";
-            writeInstancePath(out, instance.path, host);
-            writeInstanceOf(out, instance, origins);
-            out += "</VALUE.OBJECTWITHPATH>";
-        });
+    return spoolAnswer(
+        request.call,
+        spooled<Instance>(
+            request,
+            [origins, &host = request.manager.host()](std::string& out, const Instance& instance) {
+                out += "<VALUE.OBJECTWITHPATH>";
+                writeInstancePath(out, instance.path, host);
+                writeInstanceOf(out, instance, origins);
+                out += "</VALUE.OBJECTWITHPATH>";
+            },
+            [&](auto& receiver) {
+                const ObjectPath& path = question.object.path;
+                return kind == Kind::associators
+                           ? request.manager.associators(path, question.filter, receiver)
+                           : request.manager.references(path, question.filter, receiver);
+            }));
 }
 
 Answer namesAnswer(Request& request, Kind kind) {
     const Question question = questionOf(request, kind, Result::names);
     if (question.object.isClass) {
-        return classesAnswer(request, question, kind, Result::names);
+        return classAssociationsAnswer(request, question, kind, Result::names);
     }
-    auto result = kind == Kind::associators
-                      ? request.manager.associatorNames(question.object.path, question.filter)
-                      : request.manager.referenceNames(question.object.path, question.filter);
-    requireOk(result.status);
-    return listAnswer(request.call, present(std::move(result.paths)),
-                      [host = request.manager.host()](std::string& out, const ObjectPath& path) {
-                          out += "<OBJECTPATH>";
-                          writeInstancePath(out, path, host);
-                          out += "</OBJECTPATH>";
-                      });
+    return spoolAnswer(
+        request.call,
+        spooled<ObjectPath>(
+            request,
+            [&host = request.manager.host()](std::string& out, const ObjectPath& path) {
+                out += "<OBJECTPATH>";
+                writeInstancePath(out, path, host);
+                out += "</OBJECTPATH>";
+            },
+            [&](auto& receiver) {
+                const ObjectPath& path = question.object.path;
+                return kind == Kind::associators
+                           ? request.manager.associatorNames(path, question.filter, receiver)
+                           : request.manager.referenceNames(path, question.filter, receiver);
+            }));
 }
 
 }  // namespace

@@ -53,17 +53,17 @@ Answer getClass(Request& request) {
 
 Answer enumerateClasses(Request& request) {
     const ClassForm form = classForm(request);
-    return listAnswer(request.call, classesBelow(request),
-                      [form](std::string& out, const ClassDeclaration* declaration) {
-                          writeClass(out, *declaration, form);
-                      });
+    return classesAnswer(request.call, classesBelow(request),
+                         [form](std::string& out, const ClassDeclaration* declaration) {
+                             writeClass(out, *declaration, form);
+                         });
 }
 
 Answer enumerateClassNames(Request& request) {
-    return listAnswer(request.call, classesBelow(request),
-                      [](std::string& out, const ClassDeclaration* declaration) {
-                          writeClassName(out, declaration->name);
-                      });
+    return classesAnswer(request.call, classesBelow(request),
+                         [](std::string& out, const ClassDeclaration* declaration) {
+                             writeClassName(out, declaration->name);
+                         });
 }
 
 }  // namespace

@@ -29,10 +29,6 @@ std::string randomContext() {
 
 }  // namespace
 
-std::size_t EnumerationSession::size() const {
-    return std::visit([](const auto& rest) { return rest.size(); }, objects);
-}
-
 EnumerationSessions::EnumerationSessions(SessionLimits limits,
                                          std::function<Clock::time_point()> now)
     : limits_(limits), now_(std::move(now)) {}
@@ -73,7 +69,7 @@ void EnumerationSessions::use(const std::string& context, const std::optional<st
     const auto found = find(context, user);
     use(found->second.session);
     found->second.end = now + found->second.session.timeout;
-    if (found->second.session.size() == 0) {
+    if (found->second.session.left == 0) {
         entries_.erase(found);
     }
 }

@@ -77,6 +77,13 @@ HttpAnswer HttpAnswer::failure(const HttpFailure& failure) {
     return HttpAnswer::failure(failure.status, failure.cimError);
 }
 
+HttpAnswer HttpAnswer::refusal() {
+    constexpr unsigned unauthorized = 401;
+    HttpAnswer answer = failure(unauthorized);
+    answer.authenticate = true;
+    return answer;
+}
+
 HttpAnswer HttpAnswer::of(Answer answer) {
     HttpAnswer made;
     answer.write(made.begun, pieceSize);
@@ -93,6 +100,11 @@ void Exchange::suspend() {
 bool Exchange::handedOver() const {
     const std::lock_guard lock(mutex_);
     return handedOver_;
+}
+
+bool Exchange::isFinished() const {
+    const std::lock_guard lock(mutex_);
+    return finished_;
 }
 
 void Exchange::finish(HttpAnswer answer) {
@@ -142,6 +154,10 @@ MHD_Result sendAnswer(MHD_Connection* connection, HttpAnswer answer, bool manPos
     constexpr unsigned methodNotAllowed = 405;
     if (answer.status == methodNotAllowed) {
         add("Allow", "POST, M-POST");
+    }
+    constexpr unsigned serviceUnavailable = 503;
+    if (answer.status == serviceUnavailable) {
+        add("Retry-After", "10");
     }
     return complete ? MHD_queue_response(connection, answer.status, response.get()) : MHD_NO;
 }

@@ -25,6 +25,8 @@ struct HttpAnswer {
 
     static HttpAnswer failure(unsigned status, std::string cimError = "");
     static HttpAnswer failure(const HttpFailure& failure);
+    /// Of credentials, or of a request without them.
+    static HttpAnswer refusal();
     /// Writes the beginning of the body at once.
     static HttpAnswer of(Answer answer);
 };
@@ -51,6 +53,8 @@ class Exchange {
     /// Lets the connection rest until finish(). Only in its own thread.
     void suspend();
     [[nodiscard]] bool handedOver() const;
+    /// Whether it has its answer: nobody waits for another one.
+    [[nodiscard]] bool isFinished() const;
     /// Gives the answer and wakes the connection. Only the first call counts.
     void finish(HttpAnswer answer);
     /// The answer, once there is one.
@@ -64,6 +68,8 @@ class Exchange {
     bool finished_ = false;
     std::optional<HttpAnswer> answer_;
 };
+
+using SharedExchange = std::shared_ptr<Exchange>;
 
 /// Sends the answer of a request, which may go on for long after the call.
 /// `manPost`: the request was an M-POST. Answers what libmicrohttpd wants to hear.

@@ -33,28 +33,32 @@ Answer enumerateInstances(Request& request) {
     const ClassRepository* const origins = originsWanted(request);
     const InstanceRequest reading = readingRequest(request);
     request.parameters.finish();
-    auto result = request.manager.enumerateInstances(classPath(request, className), reading);
-    requireOk(result.status);
-    std::vector<Instance> instances = present(std::move(result.instances));
-    if (!deep) {
-        cutToClass(instances, requireClass(request, className, CimStatus::invalidClass));
-    }
-    return listAnswer(request.call, std::move(instances),
-                      [origins](std::string& out, const Instance& instance) {
-                          out += "<VALUE.NAMEDINSTANCE>";
-                          writeInstanceName(out, instance.path);
-                          writeInstanceOf(out, instance, origins);
-                          out += "</VALUE.NAMEDINSTANCE>";
-                      });
+    const ClassDeclaration* const cut =
+        deep ? nullptr : request.manager.repository().find(className);
+    return spoolAnswer(request.call, spooled<Instance>(
+                                         request,
+                                         [origins, cut](std::string& out, Instance& instance) {
+                                             cutToClass(instance, cut);
+                                             out += "<VALUE.NAMEDINSTANCE>";
+                                             writeInstanceName(out, instance.path);
+                                             writeInstanceOf(out, instance, origins);
+                                             out += "</VALUE.NAMEDINSTANCE>";
+                                         },
+                                         [&](auto& receiver) {
+                                             return request.manager.enumerateInstances(
+                                                 classPath(request, className), reading, receiver);
+                                         }));
 }
 
 Answer enumerateInstanceNames(Request& request) {
     const std::string className = request.parameters.requiredClassName("ClassName");
     request.parameters.finish();
-    auto result = request.manager.enumerateInstanceNames(
-        classPath(request, className), {std::nullopt, request.caller.user.value_or("")});
-    requireOk(result.status);
-    return listAnswer(request.call, present(std::move(result.paths)), writeInstanceName);
+    const InstanceRequest reading{std::nullopt, request.caller.user.value_or("")};
+    return spoolAnswer(request.call,
+                       spooled<ObjectPath>(request, writeInstanceName, [&](auto& receiver) {
+                           return request.manager.enumerateInstanceNames(
+                               classPath(request, className), reading, receiver);
+                       }));
 }
 
 /// Adds what the class has and the provider left out, as null: clients that modify
@@ -86,13 +90,13 @@ Answer getInstance(Request& request) {
     request.parameters.finish();
     auto result = request.manager.getInstance(path, reading);
     requireOk(result.status);
-    std::vector<Instance> instances = present(std::move(result.instances));
-    if (instances.empty()) {
+    if (result.instances.empty() || !result.instances.front()) {
         throw CimError(CimStatus::notFound, "");
     }
-    addNulls(instances.front(), request.manager.repository(), reading.propertyList);
+    Instance& instance = *result.instances.front();
+    addNulls(instance, request.manager.repository(), reading.propertyList);
     std::string content = "<IRETURNVALUE>";
-    writeInstanceOf(content, instances.front(), origins);
+    writeInstanceOf(content, instance, origins);
     return plainAnswer(request.call, content + "</IRETURNVALUE>");
 }
 

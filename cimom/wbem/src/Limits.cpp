@@ -32,8 +32,10 @@ void Limits::check() const {
     checkRange("max-depth", depth, 8, 256);
     checkRange("max-connections", connections, 1, 65536);
     checkRange("workers", workers, 1, 256);
+    checkRange("max-stuck", stuck, 1, 256);
     checkRange("io-threads", ioThreads, 1, 64);
     checkRange("max-waiting", waiting, 1, 65536);
+    checkRange("max-result", result, kibi, std::size_t{1} << 40U);
     checkSeconds("request-timeout", request, day);
     checkSeconds("answer-timeout", answer, day);
     checkRange("max-enumerations", sessions.sessions, 1, 65536);

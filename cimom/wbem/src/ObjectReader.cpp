@@ -17,6 +17,15 @@ namespace {
 constexpr unsigned deepestEmbedding = 4;
 constexpr std::size_t embeddedDepth = 64;
 
+/// No class has more; each name is compared with all others.
+constexpr std::size_t mostNames = 4096;
+
+void refuseTooMany(const XmlElement& element) {
+    if (element.children.size() > mostNames) {
+        throw NotValid("more than " + std::to_string(mostNames) + " elements in " + element.name);
+    }
+}
+
 [[noreturn]] void misplaced(const XmlElement& inner, const XmlElement& outer) {
     throw NotValid("element " + inner.name + " in " + outer.name);
 }
@@ -94,6 +103,7 @@ ObjectPath readInstanceName(const XmlElement& element) {
         path.keys.push_back({"", readKey(onlyChild(element), "the key")});
         return path;
     }
+    refuseTooMany(element);
     for (const XmlElement& binding : element.children) {
         if (binding.name != "KEYBINDING") {
             misplaced(binding, element);
@@ -226,27 +236,32 @@ Value readReferenceProperty(const XmlElement& element) {
                                 : referenceValue(readReference(*reference));
 }
 
+Value readAnyProperty(const XmlElement& element, unsigned embedding, const std::string& name) {
+    if (element.name == "PROPERTY") {
+        return readProperty(element, embedding, name);
+    }
+    return element.name == "PROPERTY.ARRAY" ? readArrayProperty(element, embedding, name)
+                                            : readReferenceProperty(element);
+}
+
 Instance readInstanceAt(const XmlElement& element, unsigned embedding) {
     expectName(element, "INSTANCE");
     expectNoText(element);
+    refuseTooMany(element);
     Instance instance;
     instance.path.className = requiredAttribute(element, "CLASSNAME");
     for (const XmlElement& child : element.children) {
         if (child.name == "QUALIFIER") {
             continue;
         }
-        const bool scalar = child.name == "PROPERTY";
-        const bool array = child.name == "PROPERTY.ARRAY";
-        if (!scalar && !array && child.name != "PROPERTY.REFERENCE") {
+        if (!isProperty(child)) {
             misplaced(child, element);
         }
         const std::string& name = requiredAttribute(child, "NAME");
         if (instance.property(name) != nullptr) {
             throw CimError(CimStatus::invalidParameter, "property " + name + " is given twice");
         }
-        instance.properties.push_back({name, scalar  ? readProperty(child, embedding, name)
-                                             : array ? readArrayProperty(child, embedding, name)
-                                                     : readReferenceProperty(child)});
+        instance.properties.push_back({name, readAnyProperty(child, embedding, name)});
     }
     return instance;
 }
@@ -327,6 +342,25 @@ ObjectPath readPath(const XmlElement& element) {
 
 Instance readInstance(const XmlElement& element) {
     return readInstanceAt(element, 0);
+}
+
+bool isProperty(const XmlElement& element) {
+    return element.name == "PROPERTY" || element.name == "PROPERTY.ARRAY" ||
+           element.name == "PROPERTY.REFERENCE";
+}
+
+Value readPropertyValue(const XmlElement& element, const std::string& name) {
+    if (!isProperty(element)) {
+        throw NotValid("element " + element.name + " where a property belongs");
+    }
+    return readAnyProperty(element, 0, name);
+}
+
+Value readQualifierValue(const XmlElement& element) {
+    expectName(element, "QUALIFIER");
+    const std::string& name = requiredAttribute(element, "NAME");
+    const bool array = !element.children.empty() && element.children.front().name == "VALUE.ARRAY";
+    return array ? readArrayProperty(element, 0, name) : readProperty(element, 0, name);
 }
 
 const std::string& readText(const XmlElement& element) {

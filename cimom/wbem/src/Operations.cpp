@@ -29,8 +29,11 @@ const Table& table() {
 
 }  // namespace
 
-Operations::Operations(ObjectManager& manager, SessionLimits limits, ModificationLog log)
-    : manager_(manager), sessions_(limits), log_(std::move(log)) {}
+Operations::Operations(ObjectManager& manager, const Limits& limits, ModificationLog log)
+    : manager_(manager),
+      sessions_(limits.sessions),
+      largestResult_(limits.result),
+      log_(std::move(log)) {}
 
 Answer Operations::perform(const Call& call, const Caller& caller) {
     const auto found = call.intrinsic ? table().find(call.method) : table().end();
@@ -41,7 +44,7 @@ Answer Operations::perform(const Call& call, const Caller& caller) {
                                   "the operation " + call.method + " is not offered"));
     }
     try {
-        Request request{manager_, sessions_, log_, call, caller, Parameters(call)};
+        Request request{manager_, sessions_, largestResult_, log_, call, caller, Parameters(call)};
         return found->second(request);
     } catch (const CimError& error) {
         return Answer(errorAnswer(call, error.code, error.what()));

@@ -1,6 +1,9 @@
 // The pull operations (DSP0200, 5.4.2): a result is opened, and fetched in portions.
 #include <algorithm>
+#include <optional>
+#include <utility>
 
+#include "PulledRecords.h"
 #include "Request.h"
 #include "wbem/ObjectWriter.h"
 #include "wbem/XmlText.h"
@@ -37,15 +40,25 @@ Opening readOpening(Request& request) {
     return {request.sessions.timeoutFor(timeout), std::min(portion, largestPortion)};
 }
 
-template <typename Object>
-std::vector<Object> takePortion(std::vector<Object>& rest, std::size_t count) {
-    std::vector<Object> portion;
-    portion.reserve(std::min(count, rest.size()));
-    while (!rest.empty() && portion.size() < count) {
-        portion.push_back(std::move(rest.back()));
-        rest.pop_back();
+/// Objects that one answer brings.
+struct Portion {
+    RecordReader reader;
+    std::string context;  ///< to go on with; empty: these were the last
+};
+
+/// The next objects of a session, at most `count`.
+Portion takePortion(Session& session, std::size_t count, const std::string& context) {
+    RecordReader rest(session.records, session.position, session.records->size());
+    if (count >= session.left) {
+        session.left = 0;
+        return {std::move(rest), ""};
     }
-    return portion;
+    RecordReader behind = rest;
+    behind.skip(count);
+    const std::size_t begin = session.position;
+    session.position = behind.position();
+    session.left -= count;
+    return {RecordReader(session.records, begin, session.position), context};
 }
 
 std::string sequenceState(const std::string& context) {
@@ -56,53 +69,69 @@ std::string sequenceState(const std::string& context) {
     return text + "</VALUE></PARAMVALUE>";
 }
 
-Answer pathsPortion(Request& request, Session::Paths paths, const std::string& context) {
-    return listAnswer(
-        request.call, std::move(paths),
-        [host = request.manager.host()](std::string& out, const ObjectPath& path) {
-            writeInstancePath(out, path, host);
-        },
-        sequenceState(context));
-}
+enum class Form { path, instance, instanceWithPath };
 
-Answer instancesPortion(Request& request, Session::Instances instances, bool classOrigin,
-                        const std::string& context) {
-    const ClassRepository* const origins = classOrigin ? &request.manager.repository() : nullptr;
-    return listAnswer(
-        request.call, std::move(instances),
-        [origins, host = request.manager.host()](std::string& out, const Instance& instance) {
-            out += "<VALUE.INSTANCEWITHPATH>";
-            writeInstancePath(out, instance.path, host);
-            writeInstanceOf(out, instance, origins);
-            out += "</VALUE.INSTANCEWITHPATH>";
-        },
-        sequenceState(context));
+Answer portionAnswer(Request& request, Portion portion, Form form) {
+    return {answerHead(request.call) + "<IRETURNVALUE>",
+            [reader = std::move(portion.reader), form](std::string& out) mutable {
+                const auto record = reader.next();
+                if (!record) {
+                    return false;
+                }
+                const bool both = form == Form::instanceWithPath;
+                out += both ? "<VALUE.INSTANCEWITHPATH>" : "";
+                out += form == Form::instance ? "" : record->path;
+                out += record->object;
+                out += both ? "</VALUE.INSTANCEWITHPATH>" : "";
+                return true;
+            },
+            "</IRETURNVALUE>" + sequenceState(portion.context) + answerTail(request.call)};
 }
 
 /// Answers the first portion, and keeps what is left.
-template <typename Object>
-std::pair<std::vector<Object>, std::string> begin(Request& request, const Opening& opening,
-                                                  std::vector<Object> objects, bool classOrigin) {
-    std::reverse(objects.begin(), objects.end());
-    std::vector<Object> portion = takePortion(objects, opening.portion);
-    std::string context;
-    if (!objects.empty()) {
-        context = request.sessions.open(
-            {std::move(objects), classOrigin, opening.timeout, request.caller.user});
+Answer begin(Request& request, const Opening& opening, Session::Kind kind,
+             const SpooledResult& result) {
+    Session session{kind, result.spool, 0, result.count, opening.timeout, request.caller.user};
+    Portion portion = takePortion(session, opening.portion, "");
+    if (session.left > 0) {
+        portion.context = request.sessions.open(std::move(session));
     }
-    return {std::move(portion), std::move(context)};
+    return portionAnswer(request, std::move(portion),
+                         kind == Session::Kind::paths ? Form::path : Form::instanceWithPath);
 }
 
-Answer openPaths(Request& request, const Opening& opening, PathsResult result) {
-    requireOk(result.status);
-    auto [portion, context] = begin(request, opening, present(std::move(result.paths)), false);
-    return pathsPortion(request, std::move(portion), context);
+template <typename Ask>
+Answer openPaths(Request& request, const Opening& opening, Ask&& ask) {
+    return begin(request, opening, Session::Kind::paths,
+                 spooled<ObjectPath>(
+                     request,
+                     [&host = request.manager.host(), text = std::string()](
+                         std::string& out, const ObjectPath& path) mutable {
+                         text.clear();
+                         writeInstancePath(text, path, host);
+                         appendRecord(out, text, "");
+                     },
+                     std::forward<Ask>(ask)));
 }
 
-Answer openInstances(Request& request, const Opening& opening, std::vector<Instance> instances,
-                     bool classOrigin) {
-    auto [portion, context] = begin(request, opening, std::move(instances), classOrigin);
-    return instancesPortion(request, std::move(portion), classOrigin, context);
+/// `cut`: the class to whose properties the instances are cut; null: all are shown.
+template <typename Ask>
+Answer openInstances(Request& request, const Opening& opening, bool classOrigin,
+                     const ClassDeclaration* cut, Ask&& ask) {
+    const ClassRepository* const origins = classOrigin ? &request.manager.repository() : nullptr;
+    return begin(request, opening, Session::Kind::instances,
+                 spooled<Instance>(
+                     request,
+                     [&host = request.manager.host(), origins, cut, path = std::string(),
+                      text = std::string()](std::string& out, Instance& instance) mutable {
+                         cutToClass(instance, cut);
+                         path.clear();
+                         text.clear();
+                         writeInstancePath(path, instance.path, host);
+                         writeInstanceOf(text, instance, origins);
+                         appendRecord(out, path, text);
+                     },
+                     std::forward<Ask>(ask)));
 }
 
 Answer openEnumerateInstances(Request& request) {
@@ -112,22 +141,21 @@ Answer openEnumerateInstances(Request& request) {
     const InstanceRequest reading{request.parameters.texts("PropertyList"),
                                   request.caller.user.value_or("")};
     const Opening opening = readOpening(request);
-    auto result = request.manager.enumerateInstances(classPath(request, className), reading);
-    requireOk(result.status);
-    std::vector<Instance> instances = present(std::move(result.instances));
-    if (!deep) {
-        cutToClass(instances, requireClass(request, className, CimStatus::invalidClass));
-    }
-    return openInstances(request, opening, std::move(instances), classOrigin);
+    const ClassDeclaration* const cut =
+        deep ? nullptr : request.manager.repository().find(className);
+    return openInstances(request, opening, classOrigin, cut, [&](auto& receiver) {
+        return request.manager.enumerateInstances(classPath(request, className), reading, receiver);
+    });
 }
 
 Answer openEnumerateInstancePaths(Request& request) {
     const std::string className = request.parameters.requiredClassName("ClassName");
     const Opening opening = readOpening(request);
-    return openPaths(
-        request, opening,
-        request.manager.enumerateInstanceNames(classPath(request, className),
-                                               {std::nullopt, request.caller.user.value_or("")}));
+    const InstanceRequest reading{std::nullopt, request.caller.user.value_or("")};
+    return openPaths(request, opening, [&](auto& receiver) {
+        return request.manager.enumerateInstanceNames(classPath(request, className), reading,
+                                                      receiver);
+    });
 }
 
 /// The parameters of the Open operations about associations; there the source is
@@ -159,19 +187,19 @@ Source readSource(Request& request, bool associators, bool instances) {
 Answer openAssociated(Request& request, bool associators) {
     const Source source = readSource(request, associators, true);
     const Opening opening = readOpening(request);
-    auto result = associators ? request.manager.associators(source.path, source.filter)
-                              : request.manager.references(source.path, source.filter);
-    requireOk(result.status);
-    return openInstances(request, opening, present(std::move(result.instances)),
-                         source.classOrigin);
+    return openInstances(request, opening, source.classOrigin, nullptr, [&](auto& receiver) {
+        return associators ? request.manager.associators(source.path, source.filter, receiver)
+                           : request.manager.references(source.path, source.filter, receiver);
+    });
 }
 
 Answer openAssociatedPaths(Request& request, bool associators) {
     const Source source = readSource(request, associators, false);
     const Opening opening = readOpening(request);
-    return openPaths(request, opening,
-                     associators ? request.manager.associatorNames(source.path, source.filter)
-                                 : request.manager.referenceNames(source.path, source.filter));
+    return openPaths(request, opening, [&](auto& receiver) {
+        return associators ? request.manager.associatorNames(source.path, source.filter, receiver)
+                           : request.manager.referenceNames(source.path, source.filter, receiver);
+    });
 }
 
 /// What a Pull operation asks for.
@@ -188,52 +216,32 @@ Pulling readPulling(Request& request) {
     return pulling;
 }
 
-/// The next portion of a session with such objects, and the context to go on with.
-template <typename Objects>
-std::pair<Objects, std::string> pull(Request& request, bool* classOrigin) {
+/// Answers with the next portion of a session with such objects.
+Answer pull(Request& request, Session::Kind kind, Form form) {
     const Pulling pulling = readPulling(request);
-    Objects portion;
-    std::string context = pulling.context;
+    std::optional<Portion> portion;
     request.sessions.use(pulling.context, request.caller.user, [&](Session& session) {
-        auto* const rest = std::get_if<Objects>(&session.objects);
-        if (rest == nullptr) {
+        if (session.kind != kind) {
             throw CimError(CimStatus::invalidEnumerationContext,
                            "this enumeration was opened for another kind of pull");
         }
-        portion = takePortion(*rest, pulling.portion);
-        if (classOrigin != nullptr) {
-            *classOrigin = session.classOrigin;
-        }
-        if (rest->empty()) {
-            context.clear();
-        }
+        portion = takePortion(session, pulling.portion, pulling.context);
     });
-    return {std::move(portion), std::move(context)};
+    return portionAnswer(request, *std::move(portion), form);
 }
 
 Answer pullInstancesWithPath(Request& request) {
-    bool classOrigin = false;
-    auto [portion, context] = pull<Session::Instances>(request, &classOrigin);
-    return instancesPortion(request, std::move(portion), classOrigin, context);
+    return pull(request, Session::Kind::instances, Form::instanceWithPath);
 }
 
 Answer pullInstancePaths(Request& request) {
-    auto [portion, context] = pull<Session::Paths>(request, nullptr);
-    return pathsPortion(request, std::move(portion), context);
+    return pull(request, Session::Kind::paths, Form::path);
 }
 
 /// DSP0200 has this for queries, which are not served; a client that does not need
 /// the paths may use it for any instances.
 Answer pullInstances(Request& request) {
-    bool classOrigin = false;
-    auto [portion, context] = pull<Session::Instances>(request, &classOrigin);
-    const ClassRepository* const origins = classOrigin ? &request.manager.repository() : nullptr;
-    return listAnswer(
-        request.call, std::move(portion),
-        [origins](std::string& out, const Instance& instance) {
-            writeInstanceOf(out, instance, origins);
-        },
-        sequenceState(context));
+    return pull(request, Session::Kind::instances, Form::instance);
 }
 
 Answer closeEnumeration(Request& request) {
@@ -248,7 +256,7 @@ Answer enumerationCount(Request& request) {
     request.parameters.finish();
     std::size_t count = 0;
     request.sessions.use(context, request.caller.user,
-                         [&count](const Session& session) { count = session.size(); });
+                         [&count](const Session& session) { count = session.left; });
     return plainAnswer(request.call,
                        "<IRETURNVALUE><VALUE>" + std::to_string(count) + "</VALUE></IRETURNVALUE>");
 }

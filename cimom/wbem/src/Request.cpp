@@ -1,30 +1,13 @@
 #include "Request.h"
 
 #include <algorithm>
-#include <memory>
 
 #include "wbem/ObjectWriter.h"
+#include "wbem/PathLocation.h"
 
 namespace cimom::wbem {
 
 namespace {
-
-using Reference = std::shared_ptr<const ObjectPath>;
-
-void locateKeys(std::vector<NamedValue>& keys, const std::string& nameSpace) {
-    for (NamedValue& key : keys) {
-        const Scalar* const scalar = key.value.scalar();
-        const auto* const reference = scalar == nullptr ? nullptr : std::get_if<Reference>(scalar);
-        if (reference != nullptr) {
-            ObjectPath path = **reference;
-            if (path.nameSpace.empty()) {
-                path.nameSpace = nameSpace;
-            }
-            locateKeys(path.keys, path.nameSpace);
-            key.value.content = Scalar(std::make_shared<const ObjectPath>(std::move(path)));
-        }
-    }
-}
 
 void nameBareKey(NamedValue& key, const ClassDeclaration* declaration) {
     const PropertyDeclaration* only = nullptr;
@@ -42,18 +25,6 @@ void nameBareKey(NamedValue& key, const ClassDeclaration* declaration) {
                        "a key without a name is for classes with one key only");
     }
     key.name = only->name;
-}
-
-template <typename Object>
-std::vector<Object> presentOf(std::vector<std::optional<Object>> objects) {
-    std::vector<Object> result;
-    result.reserve(objects.size());
-    for (auto& object : objects) {
-        if (object) {
-            result.push_back(*std::move(object));
-        }
-    }
-    return result;
 }
 
 }  // namespace
@@ -79,10 +50,7 @@ const ClassDeclaration& requireClass(const Request& request, const std::string& 
 }
 
 ObjectPath located(const Request& request, ObjectPath path) {
-    if (path.nameSpace.empty()) {
-        path.nameSpace = request.call.nameSpace;
-    }
-    locateKeys(path.keys, path.nameSpace);
+    locate(path, request.call.nameSpace);
     for (NamedValue& key : path.keys) {
         if (key.name.empty()) {
             nameBareKey(key, request.manager.repository().find(path.className));
@@ -107,27 +75,60 @@ void requireOk(const Status& status) {
     }
 }
 
-std::vector<ObjectPath> present(std::vector<std::optional<ObjectPath>> paths) {
-    return presentOf(std::move(paths));
-}
-
-std::vector<Instance> present(std::vector<std::optional<Instance>> instances) {
-    return presentOf(std::move(instances));
-}
-
-void cutToClass(std::vector<Instance>& instances, const ClassDeclaration& declaration) {
-    for (Instance& instance : instances) {
-        std::erase_if(instance.properties, [&declaration](const NamedValue& property) {
-            return declaration.property(property.name) == nullptr;
+void cutToClass(Instance& instance, const ClassDeclaration* declaration) {
+    if (declaration != nullptr) {
+        std::erase_if(instance.properties, [declaration](const NamedValue& property) {
+            return declaration->property(property.name) == nullptr;
         });
     }
 }
+
+template <typename Object>
+void SpoolReceiver<Object>::take(std::optional<Object> object) {
+    if (caller_.gone && caller_.gone()) {
+        throw CimError(CimStatus::failed, "nobody waits for the result any more");
+    }
+    if (object) {
+        text_.clear();
+        write_(text_, *object);
+        result_.spool->append(text_);
+        ++result_.count;
+    }
+}
+
+template <typename Object>
+std::size_t SpoolReceiver<Object>::mark() {
+    marks_.push_back({result_.spool->size(), result_.count});
+    return marks_.size() - 1;
+}
+
+template <typename Object>
+void SpoolReceiver<Object>::backTo(std::size_t mark) {
+    result_.spool->cut(marks_[mark].size);
+    result_.count = marks_[mark].count;
+}
+
+template class SpoolReceiver<ObjectPath>;
+template class SpoolReceiver<Instance>;
 
 void writeInstanceOf(std::string& out, const Instance& instance,
                      const ClassRepository* originRepository) {
     writeInstance(
         out, instance,
         originRepository == nullptr ? nullptr : originRepository->find(instance.path.className));
+}
+
+Answer spoolAnswer(const Call& call, const SpooledResult& result) {
+    return {answerHead(call) + "<IRETURNVALUE>",
+            [spool = std::shared_ptr<const Spool>(result.spool),
+             position = std::size_t{0}](std::string& out) mutable {
+                constexpr std::size_t piece = 32768;
+                const std::size_t size = std::min(piece, spool->size() - position);
+                spool->read(position, size, out);
+                position += size;
+                return size > 0;
+            },
+            "</IRETURNVALUE>" + answerTail(call)};
 }
 
 Answer plainAnswer(const Call& call, const std::string& content) {

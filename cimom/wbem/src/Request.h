@@ -1,12 +1,18 @@
 #pragma once
 
+#include <cstddef>
+#include <functional>
+#include <memory>
+#include <optional>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "Parameters.h"
 #include "wbem/Answer.h"
 #include "wbem/Errors.h"
 #include "wbem/Operations.h"
+#include "wbem/Spool.h"
 
 /// What the operations have in common.
 namespace cimom::wbem {
@@ -15,6 +21,7 @@ namespace cimom::wbem {
 struct Request {
     ObjectManager& manager;
     EnumerationSessions& sessions;
+    std::size_t largestResult;
     const Operations::ModificationLog& log;
     const Call& call;
     const Caller& caller;
@@ -52,40 +59,81 @@ void requireNameSpace(const Request& request);
 /// Throws CimError for a status other than OK.
 void requireOk(const Status& status);
 
-/// What providers delivered, without the entries that they delivered as null.
-[[nodiscard]] std::vector<ObjectPath> present(std::vector<std::optional<ObjectPath>> paths);
-[[nodiscard]] std::vector<Instance> present(std::vector<std::optional<Instance>> instances);
-
-/// Drops the properties that the class does not have.
-void cutToClass(std::vector<Instance>& instances, const ClassDeclaration& declaration);
+/// Drops the properties that the class does not have; null: leaves all.
+void cutToClass(Instance& instance, const ClassDeclaration* declaration);
 
 /// INSTANCE, with class origins when asked for.
 void writeInstanceOf(std::string& out, const Instance& instance,
                      const ClassRepository* originRepository);
 
-/// An answer with a list in its IRETURNVALUE: `write(out, object)` for each object
-/// in their order, each of which is forgotten when it has been written. `behind`
-/// are the elements after it.
-template <typename Object, typename Write>
-Answer listAnswer(const Call& call, std::vector<Object> objects, Write write,
-                  const std::string& behind = "");
+/// A result as its XML, of which `count` objects have come.
+struct SpooledResult {
+    std::shared_ptr<Spool> spool;
+    std::size_t count = 0;
+};
+
+/// Writes the objects of a result into a spool as they come, so that memory holds
+/// one of them. Absent ones are left out. Ends the request with CimError when
+/// nobody waits for it any more.
+template <typename Object>
+class SpoolReceiver final : public Receiver<Object> {
+  public:
+    using Write = std::function<void(std::string&, Object&)>;
+
+    SpoolReceiver(SpooledResult& result, const Caller& caller, Write write)
+        : result_(result), caller_(caller), write_(std::move(write)) {}
+
+    void take(std::optional<Object> object) override;
+    [[nodiscard]] std::size_t mark() override;
+    void backTo(std::size_t mark) override;
+
+  private:
+    struct Mark {
+        std::size_t size;
+        std::size_t count;
+    };
+
+    SpooledResult& result_;
+    const Caller& caller_;
+    const Write write_;
+    std::string text_;  ///< of one object; its memory is used again
+    std::vector<Mark> marks_;
+};
+
+extern template class SpoolReceiver<ObjectPath>;
+extern template class SpoolReceiver<Instance>;
+
+/// The result of a request that `ask` carries out with a receiver; each object as
+/// `write(out, object)` writes it. Throws CimError when it ends with a status.
+template <typename Object, typename Ask>
+SpooledResult spooled(Request& request, typename SpoolReceiver<Object>::Write write, Ask&& ask) {
+    SpooledResult result{std::make_shared<Spool>(request.largestResult)};
+    SpoolReceiver<Object> receiver(result, request.caller, std::move(write));
+    const RequestEnd end = std::forward<Ask>(ask)(receiver);
+    requireOk(end.status);
+    return result;
+}
+
+/// An answer whose IRETURNVALUE is the text of a spool.
+[[nodiscard]] Answer spoolAnswer(const Call& call, const SpooledResult& result);
+/// An answer with a list of classes in its IRETURNVALUE: `write(out, class)` for each.
+template <typename Write>
+Answer classesAnswer(const Call& call, std::vector<const ClassDeclaration*> classes, Write write);
 /// An answer without a list: `content` is all that is in it.
 [[nodiscard]] Answer plainAnswer(const Call& call, const std::string& content);
 
-template <typename Object, typename Write>
-Answer listAnswer(const Call& call, std::vector<Object> objects, Write write,
-                  const std::string& behind) {
+template <typename Write>
+Answer classesAnswer(const Call& call, std::vector<const ClassDeclaration*> classes, Write write) {
     return {answerHead(call) + "<IRETURNVALUE>",
-            [objects = std::move(objects), write = std::move(write),
+            [classes = std::move(classes), write = std::move(write),
              next = std::size_t{0}](std::string& out) mutable {
-                if (next == objects.size()) {
+                if (next == classes.size()) {
                     return false;
                 }
-                Object object = std::move(objects[next++]);
-                write(out, object);
+                write(out, classes[next++]);
                 return true;
             },
-            "</IRETURNVALUE>" + behind + answerTail(call)};
+            "</IRETURNVALUE>" + answerTail(call)};
 }
 
 }  // namespace cimom::wbem

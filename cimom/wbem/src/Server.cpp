@@ -11,20 +11,14 @@
 #include <utility>
 
 #include "Connections.h"
+#include "Dispatcher.h"
 #include "Exchange.h"
 #include "ListeningSocket.h"
-#include "ModificationText.h"
-#include "TaskPool.h"
-#include "wbem/Authenticator.h"
-#include "wbem/Call.h"
-#include "wbem/Operations.h"
 
 namespace cimom::wbem {
 
 namespace {
 
-constexpr unsigned badRequest = 400;
-constexpr unsigned unauthorized = 401;
 constexpr unsigned contentTooLarge = 413;
 constexpr unsigned serverFault = 500;
 constexpr unsigned serviceUnavailable = 503;
@@ -58,17 +52,8 @@ class Server::Implementation {
     Implementation(ObjectManager& manager, ServerSettings settings, ServerLog log)
         : settings_(checked(std::move(settings))),
           log_(std::move(log)),
-          operations_(manager, settings_.limits.sessions,
-                      [this](const Modification& modification) {
-                          log_(LogKind::modification, modificationText(modification));
-                      }),
           connections_(settings_.limits.request, settings_.limits.answer),
-          workers_(settings_.limits.workers, settings_.limits.waiting),
-          gate_(1, settings_.limits.waiting),
-          timers_(1, settings_.limits.waiting) {
-        if (settings_.users) {
-            authenticator_.emplace(*settings_.users);
-        }
+          dispatcher_(manager, settings_, log_) {
         start();
         watch();
     }
@@ -77,9 +62,7 @@ class Server::Implementation {
         stopping_ = true;
         MHD_quiesce_daemon(daemon_.get());
         // Nobody else finishes a request from here on but those that a worker has.
-        timers_.stop();
-        gate_.stop();
-        workers_.stop();
+        dispatcher_.stop();
         connections_.endAll();
         const auto patience = Connections::Clock::now() + farewell;
         while (connections_.isBusy() && Connections::Clock::now() < patience) {
@@ -102,8 +85,6 @@ class Server::Implementation {
     }
 
   private:
-    using SharedExchange = std::shared_ptr<Exchange>;
-
     static ServerSettings checked(ServerSettings settings) {
         checkSettings(settings);
         return settings;
@@ -164,9 +145,9 @@ class Server::Implementation {
 
     /// Looks for what is overdue, again and again.
     void watch() {
-        timers_.runAfter(watchInterval, [this] {
+        dispatcher_.runAfter(watchInterval, [this] {
             connections_.endOverdue();
-            operations_.sessions().expire();
+            dispatcher_.endOverdue();
             watch();
         });
     }
@@ -250,9 +231,9 @@ class Server::Implementation {
     MHD_Result begin(MHD_Connection* connection, Exchange& exchange, const HttpHead& head) {
         try {
             exchange.headers = readHead(head, settings_.limits);
-            if (authenticator_ && !exchange.headers->authorization) {
+            if (settings_.users && !exchange.headers->authorization) {
                 // Nothing of a stranger's body is kept.
-                exchange.early = refusal();
+                exchange.early = HttpAnswer::refusal();
             } else {
                 exchange.body.reserve(exchange.headers->contentLength.value_or(0));
             }
@@ -298,9 +279,9 @@ class Server::Implementation {
         connections_.expectResult(connectionOf(connection), exchange);
         exchange->suspend();
         if (exchange->early) {
-            refuse(exchange, "nobody");
+            dispatcher_.refuse(exchange, "nobody");
         } else {
-            dispatch(exchange);
+            dispatcher_.dispatch(exchange);
         }
         return MHD_YES;
     }
@@ -315,87 +296,10 @@ class Server::Implementation {
                           std::chrono::duration_cast<std::chrono::microseconds>(time));
     }
 
-    /// Hands a request to the workers, if need be by way of the gate.
-    void dispatch(const SharedExchange& exchange) {
-        Caller caller{std::nullopt, exchange->address(), !settings_.readOnly};
-        if (!authenticator_) {
-            runOrRefuse(workers_, exchange, [this, exchange, caller] { work(exchange, caller); });
-            return;
-        }
-        if (auto identity = authenticator_->remembered(*exchange->headers->authorization)) {
-            admit(exchange, *identity);
-            return;
-        }
-        // Checking a password is slow, on purpose: one at a time, so that wrong ones
-        // leave the workers to those who have been admitted.
-        runOrRefuse(gate_, exchange, [this, exchange] {
-            const std::string& authorization = *exchange->headers->authorization;
-            try {
-                if (const auto identity = authenticator_->check(authorization)) {
-                    admit(exchange, *identity);
-                } else {
-                    refuse(exchange, authenticator_->claimedUser(authorization));
-                }
-            } catch (const std::exception& error) {
-                log_(LogKind::failure, error.what());
-                exchange->finish(HttpAnswer::failure(serverFault));
-            }
-        });
-    }
-
-    void admit(const SharedExchange& exchange, const Identity& identity) {
-        Caller caller{identity.name, exchange->address(),
-                      identity.role == Role::modify && !settings_.readOnly};
-        runOrRefuse(workers_, exchange, [this, exchange, caller] { work(exchange, caller); });
-    }
-
-    void runOrRefuse(TaskPool& pool, const SharedExchange& exchange, TaskPool::Task task) {
-        if (!pool.run(std::move(task))) {
-            log_(LogKind::failure, "too many requests wait for a worker");
-            exchange->finish(HttpAnswer::failure(serviceUnavailable));
-        }
-    }
-
-    static HttpAnswer refusal() {
-        HttpAnswer answer = HttpAnswer::failure(unauthorized);
-        answer.authenticate = true;
-        return answer;
-    }
-
-    void refuse(const SharedExchange& exchange, const std::string& who) {
-        log_(LogKind::refusal, "refused " + who + " from " + exchange->address() +
-                                   ", refusal number " +
-                                   std::to_string(authenticator_->countRefusal()));
-        if (!timers_.runAfter(settings_.refusalDelay,
-                              [exchange] { exchange->finish(refusal()); })) {
-            exchange->finish(HttpAnswer::failure(serviceUnavailable));
-        }
-    }
-
-    /// Carries a request out, in a worker.
-    void work(const SharedExchange& exchange, const Caller& caller) {
-        try {
-            const Call call = readCall(exchange->body, settings_.limits.depth);
-            checkAgreement(*exchange->headers, call);
-            exchange->finish(HttpAnswer::of(operations_.perform(call, caller)));
-        } catch (const HttpFailure& failure) {
-            log_(LogKind::request, exchange->address() + ": " + failure.what());
-            exchange->finish(HttpAnswer::failure(failure));
-        } catch (const NotValid& error) {
-            log_(LogKind::request, exchange->address() + ": " + error.what());
-            exchange->finish(HttpAnswer::failure(badRequest, "request-not-valid"));
-        } catch (const std::exception& error) {
-            log_(LogKind::failure, error.what());
-            exchange->finish(HttpAnswer::failure(serverFault));
-        }
-    }
-
     // Not constant, as the library takes its texts by pointers to plain char.
     ServerSettings settings_;
     std::string tlsPriorities_ = "NORMAL:-VERS-ALL:+VERS-TLS1.3:+VERS-TLS1.2";
     const ServerLog log_;
-    Operations operations_;
-    std::optional<Authenticator> authenticator_;
     Connections connections_;
     std::atomic<bool> starting_{true};
     std::atomic<bool> stopping_{false};
@@ -403,10 +307,8 @@ class Server::Implementation {
     std::uint16_t port_ = 0;
     int socket_ = -1;  ///< of the daemon, which leaves the closing to us once quiesced
     std::unique_ptr<MHD_Daemon, Stopped> daemon_;
-    // End first, in this order reversed: their tasks use all of the above.
-    TaskPool workers_;
-    TaskPool gate_;
-    TaskPool timers_;
+    /// Ends first: its tasks use all of the above.
+    Dispatcher dispatcher_;
 };
 
 Server::Server(ObjectManager& manager, ServerSettings settings, ServerLog log)

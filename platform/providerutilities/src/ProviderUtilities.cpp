@@ -1,5 +1,10 @@
 #include "providerutilities/ProviderUtilities.h"
 
+#include <algorithm>
+#include <array>
+
+#include "zrcommon/Strings.h"
+
 namespace ZR {
 
 namespace {
@@ -102,6 +107,17 @@ bool classIsA(const CMPIBroker* broker, const std::string& nameSpace, const char
         return false;
     }
     return broker->eft->classPathIsA(broker, path, ancestor, &status) != 0 && isOk(status);
+}
+
+/// A key's name as the schema writes it. Clients may write it in any case (DSP0004),
+/// and some object managers pass on what they wrote, while the keys of a moniker are
+/// compared exactly.
+std::string schemaKeyName(std::string_view name) {
+    constexpr std::array<std::string_view, 5> keys{"Name", "SystemName", "CreationClassName",
+                                                   "SystemCreationClassName", "InstanceID"};
+    const auto* found = std::find_if(
+        keys.begin(), keys.end(), [name](std::string_view key) { return equalNames(key, name); });
+    return std::string(found == keys.end() ? name : *found);
 }
 
 }  // namespace
@@ -304,7 +320,7 @@ bool ProviderUtilities::transformObjectPathToMoniker(const CMPIObjectPath* path,
         const CMPIData data = path->ft->getKeyAt(path, i, &name, &status);
         std::string value;
         if (isOk(status) && name != nullptr && readText(data, value)) {
-            moniker.addKey(std::string(textOf(name)), value);
+            moniker.addKey(schemaKeyName(textOf(name)), value);
         }
     }
     return true;

@@ -4,7 +4,7 @@
 #include <utility>
 #include <variant>
 
-#include "zrclient/InstrumentationService.h"
+#include "zrclient/OneMoment.h"
 
 namespace ZR {
 
@@ -23,21 +23,21 @@ void Instrumentation::stand(Snapshot::Index node) noexcept {
 }
 
 bool Instrumentation::selectNode(NodeLexicon::NodeType type) {
-    snapshot_ = InstrumentationService::process().current();
+    snapshot_ = OneMoment::current();
     walksType_ = true;
     stand(snapshot_->first(type));
     return node_ != Snapshot::none;
 }
 
 bool Instrumentation::selectNode(const std::string& path) {
-    snapshot_ = InstrumentationService::process().latest();
+    snapshot_ = OneMoment::latest();
     walksType_ = false;
     stand(snapshot_->resolve(path));
     return node_ != Snapshot::none;
 }
 
 bool Instrumentation::selectParentOf(const Instrumentation& other) {
-    auto latest = InstrumentationService::process().latest();
+    auto latest = OneMoment::latest();
     Snapshot::Index parent = Snapshot::none;
     if (latest == other.snapshot_) {
         parent = other.node_ == Snapshot::none ? other.node_ : latest->node(other.node_).parent;

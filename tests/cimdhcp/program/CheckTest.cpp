@@ -1,6 +1,7 @@
 // "cimdhcp check" on machines that lack something.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <unistd.h>
 
 #include <nlohmann/json.hpp>
 
@@ -112,6 +113,24 @@ TEST_F(Check, TellsOfANamespaceThatNobodyServes) {
     const Ended ended = check({"--namespace", "root/other"});
     EXPECT_EQ(ended.status, 1);
     EXPECT_THAT(ended.out, HasSubstr("BAD   registration: no class is served in root/other"));
+}
+
+TEST_F(Check, TellsOfAClientThatItMayNotLookInto) {
+    if (::geteuid() != 0) {
+        GTEST_SKIP() << "needs a client of another user";
+    }
+    fs::permissions(directory().path(), fs::perms::others_read | fs::perms::others_exec,
+                    fs::perm_options::add);
+    fs::copy_file("/bin/sleep", directory() / "dhclient");
+    // Of root, while the program runs as somebody else, on the live machine.
+    const Ended ended =
+        runAs("/bin/sh", {"-c", (directory() / "dhclient") + " 60 & " +
+                                    "setpriv --reuid=65534 --regid=65534 --clear-groups " +
+                                    program() + " check; kill $!"});
+    EXPECT_THAT(ended.out,
+                testing::ContainsRegex("note  live source: the network of dhclient \\(process "
+                                       "[0-9]+\\) is hidden from this user: what it does is not "
+                                       "seen\n      -> run as root, or with CAP_SYS_PTRACE"));
 }
 
 TEST_F(Check, HasAFormForPrograms) {

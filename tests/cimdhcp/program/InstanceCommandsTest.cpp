@@ -71,7 +71,7 @@ TEST_F(InstanceCommands, InstancesShowsMeanings) {
 }
 
 TEST_F(InstanceCommands, InstancesWrapsValuesOnATerminal) {
-    EXPECT_EQ(runOnTerminal(50, {"instances", "QVXZR_DHCPCapabilities"}),
+    EXPECT_EQ(runOnTerminal(50, {"--color", "never", "instances", "QVXZR_DHCPCapabilities"}),
               (Ended{0,
                      "root/cimv2:QVXZR_DHCPCapabilities.InstanceID=\"eth0\"\n"
                      "  InstanceID               = \"eth0\"\n"

@@ -1,3 +1,4 @@
+#include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
 #include <nlohmann/json.hpp>
@@ -7,6 +8,7 @@
 namespace {
 
 using test::Ended;
+using testing::StartsWith;
 
 class OverviewCommands : public test::ProgramTest {};
 
@@ -23,13 +25,32 @@ TEST_F(OverviewCommands, ShowListsTheInterfaces) {
 
 TEST_F(OverviewCommands, ShowCutsItsTableOnATerminalOnly) {
     writeConfiguration("eth0", "CONFIG_NAME=office\n");
-    EXPECT_EQ(runOnTerminal(60, {"show"}),
+    EXPECT_EQ(runOnTerminal(60, {"--color", "never", "show"}),
               (Ended{0,
                      "INTERFACE  DHCP  STATE   ADDRESS     SERVERS     CONFIGURAT…\n"
                      "eth0       on    bound   192.0.2.17  192.0.2.1…  office\n"
                      "eth1       off   active  198.51.10…  -           -\n",
                      ""}));
     EXPECT_EQ(run({"show"}, {{"COLUMNS", "60"}}), run({"show"}));
+}
+
+TEST_F(OverviewCommands, ColorsAreForTerminals) {
+    const std::string bold = "\x1B[1mINTERFACE";
+    EXPECT_THAT(runOnTerminal(100, {"show"}).out, StartsWith(bold));
+    EXPECT_THAT(runOnTerminal(100, {"show"}, {{"NO_COLOR", "1"}}).out, StartsWith("INTERFACE"));
+    EXPECT_THAT(run({"show"}).out, StartsWith("INTERFACE"));
+    EXPECT_THAT(run({"show", "--color", "always"}, {{"NO_COLOR", "1"}}).out, StartsWith(bold));
+}
+
+TEST_F(OverviewCommands, RowsAreSortedAndCounted) {
+    const std::string sorted = run({"show", "--sort", "dhcp", "--no-header"}).out;
+    EXPECT_LT(sorted.find("eth1"), sorted.find("eth0"));
+    EXPECT_EQ(sorted.find("INTERFACE"), std::string::npos);
+    EXPECT_EQ(run({"show", "--count"}), (Ended{0, "2\n", ""}));
+    EXPECT_EQ(run({"show", "--sort", "nothing"}),
+              (Ended{2, "",
+                     "cimdhcp: --sort: there is no column \"nothing\"; there are: SYSTEM, "
+                     "INTERFACE, DHCP, STATE, ADDRESS, SERVERS, CONFIGURATION NAME\n"}));
 }
 
 TEST_F(OverviewCommands, ShowIsJsonWhenAsked) {

@@ -37,7 +37,7 @@ std::vector<std::string> environmentOf(const Environment& extra) {
             return text.starts_with(each.first + '=');
         });
         if (!replaced && !text.starts_with("ZR_") && !text.starts_with("CIMDHCP_") &&
-            !text.starts_with("COLUMNS=")) {
+            !text.starts_with("COLUMNS=") && !text.starts_with("NO_COLOR=")) {
             result.emplace_back(text);
         }
     }
@@ -142,7 +142,8 @@ Ended ProgramTest::runAs(const std::string& program, const std::vector<std::stri
     return ended;
 }
 
-Ended ProgramTest::runOnTerminal(unsigned short columns, std::vector<std::string> arguments) const {
+Ended ProgramTest::runOnTerminal(unsigned short columns, std::vector<std::string> arguments,
+                                 const Environment& extra) const {
     const ZR::UniqueFd controller(::posix_openpt(O_RDWR | O_NOCTTY | O_CLOEXEC));
     if (!controller || ::grantpt(controller.get()) != 0 || ::unlockpt(controller.get()) != 0) {
         throw std::system_error(errno, std::generic_category(), "pseudo terminal");
@@ -156,9 +157,12 @@ Ended ProgramTest::runOnTerminal(unsigned short columns, std::vector<std::string
         size.ws_row = 24;
         ::ioctl(terminal.get(), TIOCSWINSZ, &size);
         const ZR::UniqueFd err = openOrThrow(directory_ / "err", O_WRONLY | O_CREAT | O_TRUNC);
-        child = start(program(), onTree(std::move(arguments)),
-                      {{"ZR_CONFIG", directory_ / "platform.conf"}, {"ZR_LOG_SINK", "none"}},
-                      terminal.get(), err.get());
+        Environment environment{{"ZR_CONFIG", directory_ / "platform.conf"},
+                                {"ZR_LOG_SINK", "none"},
+                                {"TERM", "xterm"}};
+        environment.insert(environment.end(), extra.begin(), extra.end());
+        child =
+            start(program(), onTree(std::move(arguments)), environment, terminal.get(), err.get());
     }
     ended.out = readAll(controller.get());
     ended.status = statusOf(child);

@@ -38,7 +38,8 @@ class ProgramTest : public ::testing::Test {
                 const Environment& extra = {}) const;
 
     /// As run(), with a terminal of that many columns for its output.
-    Ended runOnTerminal(unsigned short columns, std::vector<std::string> arguments) const;
+    Ended runOnTerminal(unsigned short columns, std::vector<std::string> arguments,
+                        const Environment& extra = {}) const;
 
     void setTree(const std::string& nodes) const;
     void writeConfiguration(const std::string& interface, const std::string& content) const {

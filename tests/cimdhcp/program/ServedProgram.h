@@ -25,6 +25,8 @@ class ServedProgram {
     /// "127.0.0.1:40123"
     [[nodiscard]] std::string host() const { return url_.substr(url_.rfind('/') + 1); }
 
+    [[nodiscard]] pid_t process() const noexcept { return child_; }
+
     /// Ends it by SIGTERM; its exit status, below 0 for another signal.
     int end();
 

@@ -1,9 +1,13 @@
 #include "Arena.h"
 
 #include <gtest/gtest.h>
+#include <unistd.h>
 
+#include <algorithm>
 #include <cstdint>
 #include <cstring>
+#include <fstream>
+#include <vector>
 
 using cimom::broker::Arena;
 
@@ -52,4 +56,42 @@ TEST(Arena, CopiesTextWithItsEnd) {
     Arena arena;
     EXPECT_STREQ(arena.copyText("text"), "text");
     EXPECT_STREQ(arena.copyText({}), "");
+}
+
+namespace {
+
+/// Bytes of this process that are in memory.
+std::size_t resident() {
+    std::size_t pages = 0;
+    std::ifstream statistics("/proc/self/statm");
+    statistics >> pages >> pages;
+    return pages * static_cast<std::size_t>(::sysconf(_SC_PAGESIZE));
+}
+
+}  // namespace
+
+TEST(Arena, KeepsAllAndLittleOfItInMemory) {
+    constexpr std::size_t blocks = 100'000;
+    constexpr std::size_t size = 1000;
+    std::vector<unsigned char*> all;
+    all.reserve(blocks);
+    const std::size_t before = resident();
+    Arena arena;
+    for (std::size_t index = 0; index < blocks; ++index) {
+        all.push_back(static_cast<unsigned char*>(arena.allocate(size)));
+        std::memset(all.back(), static_cast<int>(index % 251), size);
+    }
+    EXPECT_GT(arena.reserved(), blocks * size);
+    EXPECT_LT(resident() - std::min(before, resident()), blocks * size / 5);
+    for (std::size_t index = 0; index < blocks; index += 99) {
+        ASSERT_EQ(all[index][0], index % 251);
+        ASSERT_EQ(all[index][size - 1], index % 251);
+    }
+}
+
+TEST(Arena, HasAnEnd) {
+    Arena arena;
+    EXPECT_THROW(arena.allocate(Arena::largest + 1), std::bad_alloc);
+    arena.allocate(100);
+    EXPECT_THROW(arena.allocate(Arena::largest - 50), std::bad_alloc);
 }

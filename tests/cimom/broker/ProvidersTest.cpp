@@ -92,9 +92,49 @@ TEST_F(BadProviders, NullResultsAreAbsentEntries) {
 
 TEST_F(BadProviders, ResultEndsWhenTheSlotReturns) {
     const PathsResult result = ask("Test_Done");
-    EXPECT_EQ(result.returnDoneCalls, 3U);
+    EXPECT_EQ(result.returnDoneCalls, 100U);
     EXPECT_EQ(result.paths.size(), 1U);
     EXPECT_EQ(ask("Test_WrongClass").returnDoneCalls, 0U);
+}
+
+/// Counts what comes, and throws at the object of a number.
+template <typename Object>
+class Counter : public Receiver<Object> {
+  public:
+    explicit Counter(std::size_t last) : last_(last) {}
+    void take(std::optional<Object> /*object*/) override {
+        if (count == last_) {
+            throw std::runtime_error("enough");
+        }
+        ++count;
+    }
+    std::size_t mark() override { return count; }
+    void backTo(std::size_t mark) override { count = mark; }
+
+    std::size_t count = 0;
+
+  private:
+    std::size_t last_;
+};
+
+TEST_F(BadProviders, AMillionResultsAreHeldByNobody) {
+    const ObjectPath million = parseObjectPath("root/test:Test_Million");
+    Counter<ObjectPath> paths(2'000'000);
+    EXPECT_EQ(manager.enumerateInstanceNames(million, {}, paths).status, Status{});
+    EXPECT_EQ(paths.count, 1'000'000U);
+    // The provider does not listen when it is told to stop, and gets an end all the same.
+    Counter<Instance> some(10);
+    EXPECT_THROW(manager.enumerateInstances(million, {}, some), std::runtime_error);
+    EXPECT_EQ(some.count, 10U);
+    EXPECT_EQ(ask("Test_Done").status, Status{});
+}
+
+TEST_F(BadProviders, WhatCameBeforeAnErrorIsTakenBack) {
+    Counter<ObjectPath> paths(10);
+    const RequestEnd end =
+        manager.enumerateInstanceNames(parseObjectPath("root/test:Test_PartialError"), {}, paths);
+    EXPECT_EQ(end.status, (Status{CMPI_RC_ERR_ACCESS_DENIED, "not you"}));
+    EXPECT_EQ(paths.count, 0U);
 }
 
 TEST_F(BadProviders, ObjectsOfOtherClassesArePassedOn) {

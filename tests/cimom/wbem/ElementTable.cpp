@@ -1,8 +1,11 @@
 #include "ElementTable.h"
 
 #include <algorithm>
+#include <functional>
 #include <map>
 #include <sstream>
+#include <string_view>
+#include <utility>
 
 namespace cimom::test {
 
@@ -21,7 +24,8 @@ constexpr const char* types =
     "boolean/string/char16/uint8/sint8/uint16/sint16/uint32/sint32/uint64/sint64/datetime/"
     "real32/real64";
 
-const std::map<std::string, Rule>& rules() {
+/// The table as it is written down.
+const std::map<std::string, Rule>& table() {
     static const std::string ofProperties = std::string("QUALIFIER* ") + properties;
     static const std::string typed = std::string("NAME! TYPE!=") + types +
                                      " CLASSORIGIN PROPAGATED=true/false "
@@ -98,55 +102,109 @@ std::vector<std::string> split(const std::string& text, const std::string& separ
     return parts;
 }
 
+/// A place in a content model: one of the names, so often.
+struct Particle {
+    std::vector<std::string> names;
+    bool optional = false;
+    bool several = false;
+};
+
+struct Attribute {
+    bool required = false;
+    std::vector<std::string> values;  ///< empty: any
+};
+
+/// A rule, read once for the very many elements that it is held against.
+struct ReadRule {
+    std::map<std::string, Attribute, std::less<>> attributes;
+    std::vector<std::vector<Particle>> alternatives;
+    std::string content;
+};
+
+Particle readParticle(std::string text) {
+    Particle particle;
+    const char last = text.back();
+    particle.optional = last == '?' || last == '*';
+    particle.several = last == '*' || last == '+';
+    std::erase_if(text, [](char letter) {
+        return std::string_view("()?*+").find(letter) != std::string_view::npos;
+    });
+    particle.names = split(text, "/");
+    return particle;
+}
+
+ReadRule readRule(const Rule& rule) {
+    ReadRule made;
+    made.content = rule.content;
+    std::istringstream words(rule.attributes);
+    for (std::string word; words >> word;) {
+        const std::size_t equals = word.find('=');
+        Attribute attribute;
+        attribute.values = split(equals == std::string::npos ? "" : word.substr(equals + 1), "/");
+        std::string name = word.substr(0, equals);
+        attribute.required = name.back() == '!';
+        if (attribute.required) {
+            name.pop_back();
+        }
+        made.attributes.emplace(std::move(name), std::move(attribute));
+    }
+    const bool none = made.content == "text" || made.content.empty();
+    for (const std::string& alternative :
+         none ? std::vector<std::string>{""} : split(made.content, " | ")) {
+        std::vector<Particle>& particles = made.alternatives.emplace_back();
+        for (std::string& particle : split(alternative, " ")) {
+            particles.push_back(readParticle(std::move(particle)));
+        }
+    }
+    return made;
+}
+
+const std::map<std::string, ReadRule>& rules() {
+    static const std::map<std::string, ReadRule> all = [] {
+        std::map<std::string, ReadRule> made;
+        for (const auto& [name, rule] : table()) {
+            made.emplace(name, readRule(rule));
+        }
+        return made;
+    }();
+    return all;
+}
+
 /// Whether the children are those of one alternative. Greedy, which suffices: the
 /// models of the table are deterministic, as those of a DTD must be.
-bool matches(const std::vector<wbem::XmlElement>& children, const std::string& alternative) {
+bool matches(const std::vector<wbem::XmlElement>& children,
+             const std::vector<Particle>& alternative) {
     std::size_t at = 0;
-    for (std::string particle : split(alternative, " ")) {
-        const char last = particle.back();
-        const bool marked = last == '?' || last == '*' || last == '+';
-        if (marked) {
-            particle.pop_back();
-        }
-        std::erase_if(particle, [](char letter) { return letter == '(' || letter == ')'; });
-        const std::vector<std::string> names = split(particle, "/");
+    for (const Particle& particle : alternative) {
         std::size_t count = 0;
-        const bool several = marked && last != '?';
-        while (at < children.size() && (several || count == 0) &&
-               std::find(names.begin(), names.end(), children[at].name) != names.end()) {
+        while (at < children.size() && (particle.several || count == 0) &&
+               std::find(particle.names.begin(), particle.names.end(), children[at].name) !=
+                   particle.names.end()) {
             ++at;
             ++count;
         }
-        if (count == 0 && (!marked || last == '+')) {
+        if (count == 0 && !particle.optional) {
             return false;
         }
     }
     return at == children.size();
 }
 
-void checkAttributes(const wbem::XmlElement& element, const Rule& rule,
+void checkAttributes(const wbem::XmlElement& element, const ReadRule& rule,
                      std::vector<std::string>& found) {
-    std::map<std::string, std::vector<std::string>> known;
-    std::istringstream words(rule.attributes);
-    for (std::string word; words >> word;) {
-        const std::size_t equals = word.find('=');
-        const std::string values = equals == std::string::npos ? "" : word.substr(equals + 1);
-        std::string name = word.substr(0, equals);
-        const bool required = name.back() == '!';
-        if (required) {
-            name.pop_back();
-        }
-        known[name] = split(values, "/");
-        if (required && element.attribute(name) == nullptr) {
+    for (const auto& [name, attribute] : rule.attributes) {
+        if (attribute.required && element.attribute(name) == nullptr) {
             found.push_back(element.name + " has no " + name);
         }
     }
     for (const auto& [name, value] : element.attributes) {
-        const auto rule_ = known.find(name);
-        if (rule_ == known.end()) {
+        const auto known = rule.attributes.find(name);
+        if (known == rule.attributes.end()) {
             found.push_back(element.name + " has an attribute " + name);
-        } else if (!rule_->second.empty() && std::find(rule_->second.begin(), rule_->second.end(),
-                                                       value) == rule_->second.end()) {
+            continue;
+        }
+        const std::vector<std::string>& values = known->second.values;
+        if (!values.empty() && std::find(values.begin(), values.end(), value) == values.end()) {
             found.push_back(element.name + " has " + name + "=\"" + value + "\"");
         }
     }
@@ -159,14 +217,13 @@ void check(const wbem::XmlElement& element, std::vector<std::string>& found) {
         return;
     }
     checkAttributes(element, rule->second, found);
-    const std::string content = rule->second.content;
+    const std::string& content = rule->second.content;
     if (content != "text" && element.text.find_first_not_of(" \t\r\n") != std::string::npos) {
         found.push_back(element.name + " holds text");
     }
-    const auto alternatives =
-        content == "text" || content.empty() ? std::vector<std::string>{""} : split(content, " | ");
+    const auto& alternatives = rule->second.alternatives;
     if (std::none_of(alternatives.begin(), alternatives.end(),
-                     [&](const std::string& one) { return matches(element.children, one); })) {
+                     [&](const auto& one) { return matches(element.children, one); })) {
         found.push_back(element.name + " does not hold " + content);
     }
     for (const wbem::XmlElement& child : element.children) {

@@ -10,7 +10,7 @@ class EnumerationSessionsTest : public testing::Test {
   protected:
     static EnumerationSession session(std::optional<std::string> user = std::nullopt) {
         EnumerationSession made;
-        made.objects = EnumerationSession::Paths(2);
+        made.left = 2;
         made.timeout = std::chrono::seconds(60);
         made.user = std::move(user);
         return made;
@@ -54,9 +54,7 @@ TEST_F(EnumerationSessionsTest, BelongsToWhoOpenedIt) {
 
 TEST_F(EnumerationSessionsTest, EndsWithItsLastObject) {
     const std::string context = sessions.open(session());
-    sessions.use(context, std::nullopt, [](EnumerationSession& each) {
-        std::get<EnumerationSession::Paths>(each.objects).clear();
-    });
+    sessions.use(context, std::nullopt, [](EnumerationSession& each) { each.left = 0; });
     EXPECT_FALSE(has(context));
 }
 

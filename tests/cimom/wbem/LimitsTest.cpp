@@ -34,6 +34,8 @@ TEST(Limits, CannotBeSwitchedOffByZero) {
     EXPECT_EQ(number(&Limits::depth), "max-depth is 0; it may be 8 to 256");
     EXPECT_EQ(number(&Limits::connections), "max-connections is 0; it may be 1 to 65536");
     EXPECT_EQ(number(&Limits::workers), "workers is 0; it may be 1 to 256");
+    EXPECT_EQ(number(&Limits::stuck), "max-stuck is 0; it may be 1 to 256");
+    EXPECT_EQ(number(&Limits::result), "max-result is 0; it may be 1024 to 1099511627776");
     EXPECT_EQ(number(&Limits::ioThreads), "io-threads is 0; it may be 1 to 64");
     EXPECT_EQ(number(&Limits::waiting), "max-waiting is 0; it may be 1 to 65536");
     const auto seconds = [](std::chrono::seconds Limits::*limit, int value) {

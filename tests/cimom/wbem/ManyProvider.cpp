@@ -1,5 +1,6 @@
 // A provider of as many instances as a test or benchmark wants, of about 1,000
-// bytes each in CIM-XML, and of a class whose operations wait to be released.
+// bytes each in CIM-XML, and of classes whose operations do not return before they
+// are released: one waits, one delivers without an end.
 #include <cmpift.h>
 
 #include <condition_variable>
@@ -15,7 +16,8 @@ const CMPIBroker* broker = nullptr;
 std::mutex mutex;
 std::condition_variable changed;
 unsigned things = 3;
-bool held = false;
+/// A program that runs on its own is held by its environment, for ever.
+bool held = std::getenv("MANY_HELD") != nullptr;
 unsigned waiting = 0;
 
 CMPIStatus ok() {
@@ -63,9 +65,22 @@ void wait() {
     --waiting;
 }
 
-bool isThing(const CMPIObjectPath* op) {
+void deliverUntilReleased(const CMPIResult* result) {
+    CMPIInstance* const instance = broker->eft->newInstance(broker, pathOf("again"), nullptr);
+    std::unique_lock lock(mutex);
+    ++waiting;
+    changed.notify_all();
+    while (held) {
+        lock.unlock();
+        result->ft->returnInstance(result, instance);
+        lock.lock();
+    }
+    --waiting;
+}
+
+bool isOf(const CMPIObjectPath* op, std::string_view className) {
     const CMPIString* const name = op->ft->getClassName(op, nullptr);
-    return std::string_view(name->ft->getCharPtr(name, nullptr)) == "Many_Thing";
+    return name->ft->getCharPtr(name, nullptr) == className;
 }
 
 CMPIStatus cleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) {
@@ -74,7 +89,11 @@ CMPIStatus cleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) {
 
 CMPIStatus enumerateInstances(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
                               const CMPIObjectPath* op, const char**) {
-    if (!isThing(op)) {
+    if (isOf(op, "Many_Endless")) {
+        deliverUntilReleased(result);
+        return result->ft->returnDone(result);
+    }
+    if (!isOf(op, "Many_Thing")) {
         wait();
         return result->ft->returnDone(result);
     }

@@ -12,7 +12,18 @@ namespace cimom::test {
 
 using ::testing::IsEmpty;
 
+/// Half of a run's objects; sanitizers make each some ten times as dear.
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
 constexpr int rounds = 5000;
+#elif defined(__has_feature)
+#if __has_feature(address_sanitizer) || __has_feature(thread_sanitizer)
+constexpr int rounds = 5000;
+#else
+constexpr int rounds = 50'000;
+#endif
+#else
+constexpr int rounds = 50'000;
+#endif
 
 wbem::XmlElement parsed(const std::string& xml) {
     const wbem::XmlElement element = wbem::readXml(xml, 64);

@@ -202,10 +202,87 @@ TEST_F(WbemLimits, TimeToTakeAnAnswer) {
     RawClient client(server.port());
     client.send(httpRequest("EnumerateInstances",
                             callXml("EnumerateInstances", classParameter("Many_Thing"))));
+    ASSERT_TRUE(client.awaitAnswer());
     std::this_thread::sleep_for(std::chrono::milliseconds(2500));
     // What had been sent arrives, and then the end.
     EXPECT_FALSE(client.receive());
     setManyThings(3);
+}
+
+TEST_F(WbemLimits, Result) {
+    const auto sizeOf = [](const HttpResponse& response) {
+        const std::size_t begin = response.body.find("<IRETURNVALUE>");
+        return response.body.find("</IRETURNVALUE>") - begin - std::string("<IRETURNVALUE>").size();
+    };
+    // Some thousand bytes at least; of the things, each has about 1,000.
+    setManyThings(10);
+    const std::string call = httpRequest(
+        "EnumerateInstances", callXml("EnumerateInstances", classParameter("Many_Thing")));
+    const std::size_t size = sizeOf(TestServer({}, manyConfiguration()).ask(call));
+    ASSERT_GT(size, 5000U);
+    for (const std::size_t less : {0U, 1U}) {
+        settings.limits.result = size - less;
+        TestServer server(settings, manyConfiguration());
+        EXPECT_EQ(
+            errorOf(server.call("EnumerateInstances", classParameter("Many_Thing"))),
+            less == 0 ? "" : "27 the result is longer than " + std::to_string(size - 1) + " bytes");
+        EXPECT_EQ(errorOf(server.call("EnumerateInstanceNames", classParameter("Many_Thing"))), "");
+    }
+    setManyThings(3);
+}
+
+TEST_F(WbemLimits, WorkersThatDoNotComeBackAreReplacedSoOften) {
+    settings.limits.request = std::chrono::seconds(1);
+    settings.limits.workers = 2;
+    settings.limits.stuck = 3;
+    holdWaiting();
+    TestServer server(settings, manyConfiguration());
+    const auto call = [](const std::string& className) {
+        return httpRequest("EnumerateInstances",
+                           callXml("EnumerateInstances", classParameter(className)));
+    };
+    // One after the other, each at its deadline, as many as there may be.
+    for (unsigned count = 1; count <= 5; ++count) {
+        RawClient client(server.port());
+        client.send(call(count % 2 == 0 ? "Many_Endless" : "Many_Waiting"));
+        awaitWaiting(count);
+        const auto response = client.receive();
+        ASSERT_TRUE(response);
+        EXPECT_EQ(response->status, 503U);
+        EXPECT_EQ(response->header("Retry-After"), "10");
+        if (count < 5) {
+            EXPECT_EQ(server.ask(call("Many_Thing")).status, 200U) << count;
+        }
+    }
+    // Beyond, nobody is left, and everybody is told.
+    while (server.ask(call("Many_Thing")).status != 503U) {
+    }
+    EXPECT_THAT(server.log(wbem::LogKind::failure),
+                testing::Contains("1 operations have not returned in their time; other workers "
+                                  "take the place of theirs"));
+    releaseWaiting();
+    // Those that came back all the same are workers again.
+    while (server.ask(call("Many_Thing")).status != 200U) {
+    }
+}
+
+TEST_F(WbemLimits, ARequestWhoseTimeIsOverIsNotBegun) {
+    settings.limits.request = std::chrono::seconds(1);
+    settings.limits.workers = 1;
+    settings.limits.stuck = 1;
+    holdWaiting();
+    TestServer server(settings, manyConfiguration());
+    const std::string waiting = httpRequest(
+        "EnumerateInstances", callXml("EnumerateInstances", classParameter("Many_Waiting")));
+    std::vector<RawClient> clients;
+    for (int count = 0; count < 6; ++count) {
+        clients.emplace_back(server.port()).send(waiting);
+    }
+    for (RawClient& client : clients) {
+        EXPECT_EQ(client.receive().value_or(HttpResponse()).status, 503U);
+    }
+    // The worker and its replacement have one each; the others were never begun.
+    EXPECT_LE(releaseWaiting(), 2U);
 }
 
 }  // namespace cimom::test

@@ -2,7 +2,10 @@
 
 #include <gtest/gtest.h>
 
+#include <atomic>
 #include <future>
+#include <memory>
+#include <thread>
 
 namespace cimom::wbem {
 
@@ -38,6 +41,37 @@ TEST(TaskPool, LetsOnlySoManyWait) {
     EXPECT_TRUE(pool.run([] {}));
     EXPECT_FALSE(pool.run([] {}));
     go.set_value();
+}
+
+TEST(TaskPool, ReplacesThreadsWhoseTaskDoesNotComeBackSoOften) {
+    std::promise<void> release;
+    const std::shared_future<void> released = release.get_future().share();
+    TaskPool pool(1, 10, 1);
+    const auto runOne = [&](bool comesBack) {
+        auto begun = std::make_shared<std::promise<void>>();
+        EXPECT_TRUE(pool.run([begun, comesBack, released] {
+            begun->set_value();
+            if (!comesBack) {
+                released.wait();
+            }
+        }));
+        begun->get_future().wait();
+    };
+    using std::chrono::nanoseconds;
+    runOne(false);
+    EXPECT_EQ(pool.replaceStuck(std::chrono::hours(1)), 0U);
+    EXPECT_EQ(pool.replaceStuck(nanoseconds(0)), 1U);
+    EXPECT_EQ(pool.replaceStuck(nanoseconds(0)), 0U);  // once is enough
+    runOne(true);
+    runOne(false);
+    EXPECT_EQ(pool.replaceStuck(nanoseconds(0)), 0U);
+    EXPECT_FALSE(pool.run([] {}));
+    release.set_value();
+    while (!pool.run([] {})) {
+        std::this_thread::yield();
+    }
+    // The place of the one that was replaced is free again.
+    runOne(true);
 }
 
 TEST(TaskPool, RunsTasksNoEarlierThanTheyShould) {

@@ -172,6 +172,20 @@ std::optional<std::string> RawClient::line() {
 }
 
 std::optional<HttpResponse> RawClient::receive() {
+    auto response = receiveAny();
+    constexpr unsigned ok = 200;
+    if (response && response->status == ok) {
+        checked(response->body);
+    }
+    return response;
+}
+
+bool RawClient::awaitAnswer() {
+    std::array<char, 1> byte{};
+    return ::recv(fd_, byte.data(), byte.size(), MSG_PEEK) == 1;
+}
+
+std::optional<HttpResponse> RawClient::receiveAny() {
     HttpResponse response;
     auto status = line();
     while (status == "HTTP/1.1 100 Continue") {
@@ -272,8 +286,8 @@ void holdWaiting() {
     tellMany("manyHold");
 }
 
-void releaseWaiting() {
-    tellMany("manyRelease");
+unsigned releaseWaiting() {
+    return tellMany("manyRelease");
 }
 
 void awaitWaiting(unsigned count) {

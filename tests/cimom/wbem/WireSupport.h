@@ -59,12 +59,16 @@ class RawClient {
 
     /// False when the server has closed the connection.
     bool send(const std::string& bytes);
-    /// The next answer; none when the connection ends before it is whole.
+    /// The next answer; none when the connection ends before it is whole. The body of
+    /// a good one must be of the structure of DSP0203.
     std::optional<HttpResponse> receive();
+    /// Waits until an answer begins to arrive, and reads nothing of it.
+    bool awaitAnswer();
     /// Waits for the server to close the connection; false after ten seconds.
     bool waitForEnd();
 
   private:
+    std::optional<HttpResponse> receiveAny();
     std::optional<std::string> line();
     bool fill();
 
@@ -80,13 +84,15 @@ std::string httpRequest(const std::string& method, const std::string& body,
                         const std::string& further = "");
 
 /// The provider of many instances and of operations that do not return by
-/// themselves: its classes are Many_Thing and Many_Waiting.
+/// themselves: its classes are Many_Thing, Many_Waiting and Many_Endless, which goes
+/// on delivering, whatever it is told.
 Configuration manyConfiguration();
 /// How many instances of Many_Thing there are from now on.
 void setManyThings(unsigned count);
-/// Makes operations on Many_Waiting wait until they are released.
+/// Makes operations on Many_Waiting and Many_Endless wait until they are released.
 void holdWaiting();
-void releaseWaiting();
+/// How many operations were waiting.
+unsigned releaseWaiting();
 /// Waits until so many operations wait.
 void awaitWaiting(unsigned count);
 

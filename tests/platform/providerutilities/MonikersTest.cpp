@@ -53,6 +53,19 @@ TEST_F(MonikersTest, TextKeysAreTakenInThePathsOrder) {
     EXPECT_EQ(describe(moniker_), "SystemName=host Name= CreationClassName=C");
 }
 
+TEST_F(MonikersTest, NamesOfTheUsualKeysAreWrittenAsInTheSchema) {
+    addTextKey(path_, "name", "eth0");
+    addTextKey(path_, "SYSTEMNAME", "host");
+    addTextKey(path_, "creationclassname", "C");
+    addTextKey(path_, "systemCreationClassName", "S");
+    addTextKey(path_, "instanceid", "I");
+    addTextKey(path_, "other", "o");
+    EXPECT_TRUE(ProviderUtilities::transformObjectPathToMoniker(path_, moniker_));
+    EXPECT_EQ(describe(moniker_),
+              "Name=eth0 SystemName=host CreationClassName=C SystemCreationClassName=S "
+              "InstanceID=I other=o");
+}
+
 TEST_F(MonikersTest, KeysThatAreNoTextArePassedOver) {
     addReferenceKey(path_, "Dependent", newPath("TEST_Element"));
     addTextKey(path_, "Name", "eth0");

@@ -11,7 +11,7 @@ namespace cimom::wbem {
 /// result is never held as a whole. Used by one thread at a time.
 class Answer {
   public:
-    /// Appends the next object; false, without appending, when there is none.
+    /// Appends the next piece; false, without appending, when there is none.
     using Items = std::function<bool(std::string&)>;
 
     /// A body that is at hand.

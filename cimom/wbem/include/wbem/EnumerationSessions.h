@@ -4,29 +4,26 @@
 #include <cstddef>
 #include <cstdint>
 #include <functional>
+#include <memory>
 #include <mutex>
 #include <optional>
 #include <string>
 #include <unordered_map>
-#include <variant>
-#include <vector>
 
-#include "cimom/Cim.h"
-#include "cimom/ClassRepository.h"
+#include "wbem/Spool.h"
 
 namespace cimom::wbem {
 
 /// The rest of a result that a client pulls in portions (DSP0200, 5.4.2).
 struct EnumerationSession {
-    using Paths = std::vector<ObjectPath>;
-    using Instances = std::vector<Instance>;
+    enum class Kind { paths, instances };
 
-    std::variant<Paths, Instances> objects;  ///< those that are still to come, the next one last
-    bool classOrigin = false;
-    std::chrono::seconds timeout{0};  ///< of silence, after which it is forgotten
-    std::optional<std::string> user;  ///< who opened it; nobody else may go on
-
-    [[nodiscard]] std::size_t size() const;
+    Kind kind = Kind::paths;
+    std::shared_ptr<const Spool> records;  ///< all objects, as PulledRecords has them
+    std::size_t position = 0;              ///< of the next one
+    std::size_t left = 0;                  ///< objects that are still to come
+    std::chrono::seconds timeout{0};       ///< of silence, after which it is forgotten
+    std::optional<std::string> user;       ///< who opened it; nobody else may go on
 };
 
 struct SessionLimits {

@@ -17,7 +17,9 @@ struct Limits {
     std::size_t connections = 512;     ///< at the same time
     std::size_t workers = 4;           ///< operations that are carried out at the same time
     std::size_t ioThreads = 2;         ///< threads that read requests and send answers
+    std::size_t stuck = 16;            ///< further workers, for those that do not come back
     std::size_t waiting = 256;         ///< requests that wait for a worker
+    std::size_t result = 1U << 30U;    ///< bytes of the XML of one result
     std::chrono::seconds request{30};  ///< for a request to arrive, and for its operation
     std::chrono::seconds answer{300};  ///< for an answer to be taken
     SessionLimits sessions;

@@ -33,6 +33,13 @@ void expectNoText(const XmlElement& element);
 /// INSTANCE. The path holds the class alone.
 [[nodiscard]] Instance readInstance(const XmlElement& element);
 
+/// Whether it is PROPERTY, PROPERTY.ARRAY or PROPERTY.REFERENCE.
+[[nodiscard]] bool isProperty(const XmlElement& element);
+/// The value of such an element; `name` is for messages.
+[[nodiscard]] Value readPropertyValue(const XmlElement& element, const std::string& name);
+/// The value of QUALIFIER.
+[[nodiscard]] Value readQualifierValue(const XmlElement& element);
+
 /// VALUE: its text.
 [[nodiscard]] const std::string& readText(const XmlElement& element);
 /// VALUE.ARRAY of texts, none of which may be null.

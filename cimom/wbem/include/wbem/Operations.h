@@ -10,6 +10,7 @@
 #include "wbem/Answer.h"
 #include "wbem/Call.h"
 #include "wbem/EnumerationSessions.h"
+#include "wbem/Limits.h"
 
 namespace cimom::wbem {
 
@@ -18,6 +19,8 @@ struct Caller {
     std::optional<std::string> user;
     std::string address;
     bool mayModify = false;
+    /// Whether nobody waits for the answer any more; empty: somebody does.
+    std::function<bool()> gone = nullptr;
 };
 
 /// An attempt to change an instance, for the log.
@@ -42,7 +45,7 @@ class Operations {
     using ModificationLog = std::function<void(const Modification&)>;
 
     /// Borrows the manager.
-    Operations(ObjectManager& manager, SessionLimits limits, ModificationLog log);
+    Operations(ObjectManager& manager, const Limits& limits, ModificationLog log);
 
     /// Carries a call out. A CIM error is an answer, too. Throws NotValid when a
     /// parameter's elements are not those of DSP0203.
@@ -53,6 +56,7 @@ class Operations {
   private:
     ObjectManager& manager_;
     EnumerationSessions sessions_;
+    const std::size_t largestResult_;
     ModificationLog log_;
 };
 

@@ -58,8 +58,9 @@ using ServerLog = std::function<void(LogKind, const std::string&)>;
 /// A WBEM server: CIM-XML over HTTP at /cimom, for one object manager.
 ///
 /// A few threads read requests and write answers; a fixed pool of others carries
-/// operations out. A slow client costs a connection, never a thread; a provider
-/// that does not return costs a worker until it does.
+/// operations out. A slow client costs a connection, never a thread. A provider
+/// that does not return costs a thread, in whose place comes another one, a fixed
+/// number of times.
 class Server {
   public:
     /// Listens from now on. Borrows the manager. Throws ServerError.

@@ -74,8 +74,8 @@ struct ProviderUtilities {
                             bool dateTime);
 
     // Monikers.
-    /// Adds the path's text keys to the moniker, in the path's order; others are
-    /// skipped. False for a null path.
+    /// Adds the path's text keys to the moniker, in its order, with their names in the
+    /// schema's case; others are skipped. False for a null path.
     static bool transformObjectPathToMoniker(const CMPIObjectPath* path, Moniker& moniker);
     /// Replaces the path by a new one of the same class and namespace whose keys
     /// are the moniker's, in their order. When that fails, the path stays.

@@ -27,7 +27,8 @@ class Instrumentation {
     ~Instrumentation() = default;
 
     /// Takes the newest snapshot and stands on its first node of the type.
-    /// Asks, without blocking, whether the machine changed. False if there is none.
+    /// Asks, without blocking, whether the machine changed; inside OneMoment only the
+    /// first time. False if there is none.
     bool selectNode(NodeLexicon::NodeType type);
 
     /// Stands on the node that the path names in the latest snapshot; on nothing,

@@ -24,8 +24,9 @@ class SnapshotSource {
     /// slow is never waited for. Asks for it if that is due; reads nothing else.
     [[nodiscard]] virtual bool awaiting() { return false; }
 
-    /// Reads the present state. Never throws and never returns null: what cannot
-    /// be read is logged and left out. Takes at most 250 ms.
+    /// Reads the present state. Never returns null: what cannot be read is logged and
+    /// left out. Throws nothing but std::bad_alloc, after which changed() is true.
+    /// Takes at most 250 ms.
     [[nodiscard]] virtual std::shared_ptr<const Snapshot> read() = 0;
 };
 

@@ -61,7 +61,14 @@ std::shared_ptr<const Snapshot> JsonTreeSource::tryToRead() {
         complain(watch_.path() + ": " + std::generic_category().message(reason));
         return empty_;
     }
-    JsonTree tree = parseJsonTree(*text, getSystemName());
+    const std::string hostName = getSystemName();
+    if (hostName.empty()) {
+        const int reason = errno;
+        readAgain_ = true;
+        complain("the system does not tell its name: " + std::generic_category().message(reason));
+        return empty_;
+    }
+    JsonTree tree = parseJsonTree(*text, hostName);
     if (const auto* fault = std::get_if<JsonTreeFault>(&tree)) {
         complain(watch_.path() + ":" + std::to_string(fault->line) + ":" +
                  std::to_string(fault->column) + ": " + fault->reason);

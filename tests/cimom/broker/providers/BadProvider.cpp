@@ -46,10 +46,20 @@ CMPIStatus misbehave(const CMPIResult* result, const CMPIObjectPath* op, bool na
         return nothing;
     }
     if (name == "Test_Done") {
-        for (int count = 0; count < 3; ++count) {
+        for (int count = 0; count < 100; ++count) {
             result->ft->returnDone(result);
         }
         give(newPath("Test_Done", "after done"));
+        return status(CMPI_RC_OK);
+    }
+    if (name == "Test_Million") {
+        CMPIObjectPath* const path = newPath("Test_Million", "one of very many");
+        CMPIInstance* const instance = broker->eft->newInstance(broker, path, nullptr);
+        // The status of each is not looked at, as a bad provider does.
+        for (int count = 0; count < 1'000'000; ++count) {
+            names ? result->ft->returnObjectPath(result, path)
+                  : result->ft->returnInstance(result, instance);
+        }
         return status(CMPI_RC_OK);
     }
     if (name == "Test_WrongClass") {

@@ -199,6 +199,21 @@ TEST_F(LiveMachineTest, WhatCannotBeReadIsARemark) {
     EXPECT_THAT(machine.read()->remarks(), IsEmpty());
 }
 
+TEST_F(LiveMachineTest, WhatCouldNotBeReadIsTriedAgain) {
+    std::filesystem::create_directories(root_.path("/run/net-eth1.conf"));
+    LiveMachine& machine = open({links(1), address(2, {192, 0, 2, 1}), links(1),
+                                 address(2, {192, 0, 2, 1}), links(1), address(2, {192, 0, 2, 1})});
+    ASSERT_EQ(machine.read()->remarks().size(), 1U);
+    EXPECT_TRUE(machine.changed()) << "it may be over already";
+    ASSERT_EQ(machine.read()->remarks().size(), 1U);
+    EXPECT_FALSE(machine.changed()) << "it lasts";
+    uptime_ += std::chrono::seconds{1};
+    EXPECT_TRUE(machine.changed()) << "it may be over without a sign";
+    ASSERT_EQ(machine.read()->remarks().size(), 1U);
+    EXPECT_FALSE(machine.changed());
+    EXPECT_EQ(complaints_.size(), 1U);
+}
+
 TEST_F(LiveMachineTest, WhatSeveralReadersCannotReadIsToldOnce) {
     // Leases of two clients lie there; a link to itself is nothing that can be read.
     const std::string place = root_.path("/var/lib/NetworkManager");

@@ -228,6 +228,15 @@ TEST_F(RtnetlinkReaderTest, AMessageLongerThanItsDatagramIsLeftOutAndReported) {
     EXPECT_FALSE(state.certain);
 }
 
+TEST_F(RtnetlinkReaderTest, AMessageOfALengthWithTheHighestBitIsLeftOutAndReported) {
+    Message tooLong = linkMessage(2, "bad");
+    tooLong.claimLength(0xFFFFFFF0U);
+    const NetworkState state =
+        read({{parts({tooLong}), parts({linkMessage(3, "good"), done()})}, someAddresses()});
+    EXPECT_THAT(names(state), ElementsAre("good"));
+    EXPECT_FALSE(state.certain);
+}
+
 TEST_F(RtnetlinkReaderTest, SilenceEndsAtTheDeadline) {
     const NetworkState state = read({{}}, milliseconds{60});
     EXPECT_THAT(state.links, IsEmpty());

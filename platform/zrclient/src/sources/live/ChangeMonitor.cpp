@@ -62,8 +62,9 @@ void ChangeMonitor::begin(const std::vector<WatchedPlace>& places,
     }
     if (watches_) {
         if (rearm_ || places != places_) {
-            rearm_ = false;
+            rearm_ = true;  // until all is done
             watchAll(places, complaints);
+            rearm_ = false;
         }
     }
     changed_ = false;

@@ -159,7 +159,9 @@ void IpmiConversation::conclude(std::uint8_t channel) {
         }
     };
     take(addressSource_, lan.addressSource, "address source");
-    take(address_, lan.address, "address");
+    if (state_ == State::Underway) {
+        take(address_, lan.address, "address");
+    }
     if (state_ == State::Underway) {
         lan_ = std::move(lan);
         state_ = State::Finished;

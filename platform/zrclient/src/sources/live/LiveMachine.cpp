@@ -4,7 +4,9 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <cerrno>
 #include <iterator>
+#include <system_error>
 #include <unordered_set>
 #include <utility>
 #include <variant>
@@ -21,6 +23,10 @@ namespace ZR::Live {
 namespace {
 
 constexpr int errorLevel = 6000;
+
+// What could not be read is tried again at the next request, and, when that was of no
+// use, after so long: what is in the way may end without a sign.
+constexpr std::chrono::seconds troublePause{1};
 
 // Ten thousand links take a twentieth of it, but a machine that is busy with other things
 // gives this process its time in small pieces: half an answer would be none.
@@ -90,7 +96,8 @@ LiveMachine::LiveMachine(Surroundings surroundings)
 
 bool LiveMachine::changed() {
     // Being asked is what moves the talk with the service processor on.
-    return processor_.changed() || monitor_.changed() || socketsChanged();
+    return processor_.changed() || monitor_.changed() || socketsChanged() ||
+           (troubled_ && surroundings_.uptime() >= troubleRest_);
 }
 
 /// Nothing tells when a socket is closed. Where it is all that was seen of a client, it is
@@ -111,6 +118,16 @@ bool LiveMachine::awaiting() {
 }
 
 std::shared_ptr<const Snapshot> LiveMachine::read() {
+    try {
+        return tryToRead();
+    } catch (...) {
+        // The changes that led here were taken note of, and not what they led to.
+        monitor_.markChanged();
+        throw;
+    }
+}
+
+std::shared_ptr<const Snapshot> LiveMachine::tryToRead() {
     ClientFacts clients = readClients();
     consultNetworkd(clients);
     NetworkState network = reader_.read(std::chrono::steady_clock::now() + kernelTime);
@@ -129,10 +146,21 @@ std::shared_ptr<const Snapshot> LiveMachine::read() {
         sockets_->packetLinks = clients.packetLinks;
     }
     markWireless(surroundings_.roots, network.links);
+    std::string hostName = getSystemName();
+    if (hostName.empty()) {
+        clients.complaints.push_back("the system does not tell its name: " +
+                                     std::generic_category().message(errno));
+    }
+    planAnotherTry(clients.complaints);
+    // The service processor is asked again at its own pace.
     std::optional<ServiceProcessor> processor = processor_.read(clients.complaints);
     removeRepeated(clients.complaints);
     report(clients.complaints);
-    return decide({.hostName = getSystemName(),
+    if (hostName.empty()) {
+        // Whatever is told bears that name.
+        return SnapshotBuilder().build();
+    }
+    return decide({.hostName = std::move(hostName),
                    .links = std::move(network.links),
                    .addresses = std::move(network.addresses),
                    .clients = std::move(clients),
@@ -208,6 +236,18 @@ ClientFacts LiveMachine::readClients() {
     }
     monitor_.markChanged();
     return facts;
+}
+
+/// What went wrong for the first time may be over at once.
+void LiveMachine::planAnotherTry(const std::vector<std::string>& complaints) {
+    const bool lasts =
+        std::all_of(complaints.begin(), complaints.end(),
+                    [&](const std::string& complaint) { return reported_.contains(complaint); });
+    troubled_ = !complaints.empty();
+    troubleRest_ = surroundings_.uptime();
+    if (lasts) {
+        troubleRest_ += troublePause;
+    }
 }
 
 /// Reports what the last reading did not complain about: a lasting trouble is one

@@ -54,10 +54,12 @@ class LiveMachine final : public SnapshotSource {
     [[nodiscard]] std::shared_ptr<const Snapshot> read() override;
 
   private:
+    [[nodiscard]] std::shared_ptr<const Snapshot> tryToRead();
     [[nodiscard]] ClientFacts readClients();
     void consultNetworkd(ClientFacts& clients);
     void watchProcesses(const ClientFacts& clients);
     [[nodiscard]] bool socketsChanged() const;
+    void planAnotherTry(const std::vector<std::string>& complaints);
     void report(const std::vector<std::string>& complaints);
 
     Surroundings surroundings_;
@@ -67,7 +69,9 @@ class LiveMachine final : public SnapshotSource {
     std::vector<WatchedPlace> places_;
     std::optional<ClientFacts> sockets_;  // where nothing else tells of who has them
     std::chrono::steady_clock::time_point networkdRest_;  // not to be asked before
-    std::unordered_set<std::string> reported_;
+    std::unordered_set<std::string> reported_;            // of the last reading
+    bool troubled_ = false;                               // something could not be read
+    std::chrono::steady_clock::time_point troubleRest_;   // it is not tried again before
 };
 
 }  // namespace ZR::Live

@@ -56,8 +56,15 @@ class KernelTransport final : public NetlinkTransport {
         if (!socket_) {
             return ENOTCONN;
         }
-        const ssize_t sent = ::mnl_socket_sendto(socket_.get(), message.data(), message.size());
-        return sent < 0 ? errno : 0;
+        ssize_t sent = 0;
+        do {
+            sent = ::mnl_socket_sendto(socket_.get(), message.data(), message.size());
+        } while (sent < 0 && errno == EINTR);
+        if (sent < 0) {
+            return errno;
+        }
+        // The kernel would say nothing to a part of a question.
+        return static_cast<std::size_t>(sent) == message.size() ? 0 : EMSGSIZE;
     }
 
     Datagram receive(std::span<std::byte> buffer, Deadline deadline) override {

@@ -5,8 +5,11 @@
 #include <linux/if_link.h>
 #include <linux/rtnetlink.h>
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
+#include <cstdint>
+#include <optional>
 #include <span>
 #include <system_error>
 #include <utility>
@@ -25,6 +28,11 @@ constexpr std::size_t largestBufferSize = std::size_t{1} << 20U;
 
 std::string reasonOf(int error) {
     return std::generic_category().message(error);
+}
+
+/// The errno that the kernel says, which it says negated; EBADMSG where it says none.
+int errorIn(std::optional<std::int32_t> code) {
+    return code && *code < 0 && *code != INT32_MIN ? -*code : EBADMSG;
 }
 
 }  // namespace
@@ -139,18 +147,20 @@ template <typename Fact, typename Parse>
 bool RtnetlinkReader::take(std::size_t size, std::uint16_t request, Parse parse,
                            std::vector<Fact>& facts, Outcome& outcome) const {
     using End = Outcome::End;
-    int left = static_cast<int>(size);
-    // The buffer comes from operator new and is aligned for any structure.
-    const auto* message = static_cast<const nlmsghdr*>(static_cast<const void*>(buffer_.data()));
-    for (; ::mnl_nlmsg_ok(message, left); message = ::mnl_nlmsg_next(message, &left)) {
+    std::span<const std::byte> rest = std::span{buffer_}.first(size);
+    // libmnl's own walk takes a length of 2 GiB and more for a negative one, which fits.
+    while (const auto message = valueAt<nlmsghdr>(rest)) {
+        if (message->nlmsg_len < NLMSG_HDRLEN || message->nlmsg_len > rest.size()) {
+            break;
+        }
+        const auto bytes = rest.first(message->nlmsg_len);
+        rest = rest.subspan(std::min<std::size_t>(NLMSG_ALIGN(bytes.size()), rest.size()));
         if (message->nlmsg_seq != sequence_) {
             continue;  // the rest of an answer that was given up
         }
         if ((message->nlmsg_flags & NLM_F_DUMP_INTR) != 0) {
             outcome.interrupted = true;
         }
-        const std::span bytes{static_cast<const std::byte*>(static_cast<const void*>(message)),
-                              message->nlmsg_len};
         const auto code = valueAt<std::int32_t>(bytes.subspan(NLMSG_HDRLEN));
         switch (message->nlmsg_type) {
             case NLMSG_NOOP:
@@ -163,11 +173,11 @@ bool RtnetlinkReader::take(std::size_t size, std::uint16_t request, Parse parse,
                 if (code && *code == 0) {
                     break;  // an acknowledgement
                 }
-                outcome.reason = "refused: " + reasonOf(code ? -*code : EBADMSG);
+                outcome.reason = "refused: " + reasonOf(errorIn(code));
                 return true;
             case NLMSG_DONE:
                 if (code && *code < 0) {
-                    outcome.reason = "broken off: " + reasonOf(-*code);
+                    outcome.reason = "broken off: " + reasonOf(errorIn(code));
                 } else {
                     outcome.end = outcome.interrupted ? End::Interrupted : End::Complete;
                     outcome.reason = outcome.interrupted ? "changed while they were read" : "";
@@ -185,7 +195,7 @@ bool RtnetlinkReader::take(std::size_t size, std::uint16_t request, Parse parse,
                 }
         }
     }
-    if (left > 0) {
+    if (!rest.empty()) {
         ++outcome.unreadable;
     }
     return false;

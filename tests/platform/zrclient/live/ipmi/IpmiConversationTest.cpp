@@ -159,6 +159,15 @@ TEST_F(IpmiConversationTest, ABusyProcessorsParametersAreNotUnknown) {
     EXPECT_THAT(conversation_->complaints(), ElementsAre("address: completion code 0xc3"));
 }
 
+TEST_F(IpmiConversationTest, AFailureHasOneReasonWhateverElseWasAnswered) {
+    ScriptedProcessor busy = ScriptedProcessor::withLan(1, 2, leased);
+    busy.refuseParameter(1, 4, 0xc3);
+    busy.parameter(1, 3, {198, 51});
+    begin(std::move(busy));
+    EXPECT_EQ(later(1ms), State::Failed);
+    EXPECT_THAT(conversation_->complaints(), ElementsAre("address source: completion code 0xc3"));
+}
+
 TEST_F(IpmiConversationTest, SilenceIsGivenUpAfterOneSecond) {
     ScriptedProcessor processor;
     processor.silent = true;

@@ -1,0 +1,166 @@
+// How soon a freshly loaded library answers, and what it keeps: from opening the
+// library to the answer of its first request on a live machine of four interfaces,
+// beside the floor, a library opened and closed that does nothing. Needs root: the
+// links lie in a network namespace of its own.
+//
+// Prints Google Benchmark's figures and, below them, the ratio of the same run and by
+// how much the process grew with the library.
+
+#include <benchmark/benchmark.h>
+#include <dlfcn.h>
+#include <malloc.h>
+#include <sched.h>
+#include <sys/mount.h>
+#include <unistd.h>
+
+#include <cstdio>
+#include <cstdlib>
+#include <fstream>
+#include <map>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "cimom/ObjectManager.h"
+
+namespace {
+
+constexpr std::size_t interfaces = 4;
+
+[[noreturn]] void fail(const char* what) {
+    std::perror(what);
+    std::exit(1);
+}
+
+void enterOwnMachine() {
+    if (::unshare(CLONE_NEWNET | CLONE_NEWNS) != 0) {
+        fail("a namespace of its own needs root: unshare");
+    }
+    if (::mount("none", "/", nullptr, MS_REC | MS_PRIVATE, nullptr) != 0 ||
+        ::mount("tmpfs", "/run", "tmpfs", 0, nullptr) != 0 ||
+        ::mount("tmpfs", "/var/lib", "tmpfs", 0, nullptr) != 0) {
+        fail("mount");
+    }
+    FILE* const ip = ::popen("ip -batch -", "w");
+    if (ip == nullptr) {
+        fail("ip");
+    }
+    for (std::size_t i = 0; i < interfaces; ++i) {
+        // A finite lifetime is the kernel's own sign of an address by DHCP.
+        std::fprintf(ip,
+                     "link add b%zu type bridge\nlink set b%zu up\n"
+                     "addr add 192.0.2.%zu/32 dev b%zu valid_lft 600 preferred_lft 600\n",
+                     i, i, i + 1, i);
+    }
+    if (::pclose(ip) != 0) {
+        std::fprintf(stderr, "the links cannot be made\n");
+        std::exit(1);
+    }
+    ::setenv("ZR_LOG_SINK", "none", 1);
+    ::setenv("ZR_TRACE_SINK", "none", 1);
+}
+
+cimom::Configuration configuration() {
+    cimom::Configuration all;
+    all.schemaDirectories = {ZR_SOURCE_DIR "/schema"};
+    all.registrationFiles = {ZR_SOURCE_DIR "/schema/DHCPClientProvider.registration"};
+    all.providerDirectories = {ZR_BINARY_DIR "/lib/cmpi"};
+    return all;
+}
+
+long residentKilobytes() {
+    std::ifstream file("/proc/self/smaps_rollup");
+    std::string word;
+    long value = 0;
+    while (file >> word) {
+        if (word == "Rss:") {
+            file >> value;
+            return value;
+        }
+    }
+    fail("/proc/self/smaps_rollup");
+}
+
+/// Asks the first request of a manager, which loads the library for it.
+bool ask(cimom::ObjectManager& manager) {
+    const cimom::InstancesResult result =
+        manager.enumerateInstances({"", "root/cimv2", "QVXZR_DHCPProtocolEndpoint", {}});
+    return result.status.ok() && result.instances.size() == interfaces;
+}
+
+void bareLoad(benchmark::State& state) {
+    for (auto _ : state) {
+        void* const library =
+            ::dlopen(ZR_BINARY_DIR "/lib/cmpi/libDHCPClientProvider.so", RTLD_NOW | RTLD_LOCAL);
+        if (library == nullptr) {
+            state.SkipWithError(::dlerror());
+            return;
+        }
+        ::dlclose(library);
+    }
+}
+
+void firstAnswer(benchmark::State& state) {
+    for (auto _ : state) {
+        state.PauseTiming();
+        auto manager = std::make_unique<cimom::ObjectManager>(configuration());
+        state.ResumeTiming();
+        const bool answered = ask(*manager);
+        state.PauseTiming();
+        if (!answered) {
+            state.SkipWithError("the four interfaces do not show");
+        }
+        manager.reset();
+        state.ResumeTiming();
+    }
+}
+
+/// Growth of resident memory over the first of all requests, in kilobytes. Pages of the
+/// library that are only in the page cache until then count as well.
+long growthOfFirstLoad() {
+    auto manager = std::make_unique<cimom::ObjectManager>(configuration());
+    ::malloc_trim(0);
+    const long before = residentKilobytes();
+    if (!ask(*manager)) {
+        std::fprintf(stderr, "the four interfaces do not show\n");
+        std::exit(1);
+    }
+    return residentKilobytes() - before;
+}
+
+class Reporter : public benchmark::ConsoleReporter {
+  public:
+    void ReportRuns(const std::vector<Run>& runs) override {
+        for (const Run& run : runs) {
+            times_[run.benchmark_name()] = run.GetAdjustedRealTime();
+        }
+        ConsoleReporter::ReportRuns(runs);
+    }
+    double time(const char* name) { return times_[name]; }
+
+  private:
+    std::map<std::string, double> times_;
+};
+
+}  // namespace
+
+int main(int argc, char** argv) {
+    enterOwnMachine();
+    const long growth = growthOfFirstLoad();
+    benchmark::RegisterBenchmark("bare load", bareLoad)->Unit(benchmark::kMicrosecond);
+    benchmark::RegisterBenchmark("load to first answer", firstAnswer)
+        ->Unit(benchmark::kMicrosecond)
+        ->UseRealTime();
+    benchmark::Initialize(&argc, argv);
+    if (benchmark::ReportUnrecognizedArguments(argc, argv)) {
+        return 1;
+    }
+    Reporter reporter;
+    benchmark::RunSpecifiedBenchmarks(&reporter);
+    const double floor = reporter.time("bare load");
+    const double answer = reporter.time("load to first answer/real_time");
+    std::printf("\nload to first answer: %.0f us, %.1f of a bare load (%.0f us)\n", answer,
+                answer / floor, floor);
+    std::printf("resident memory grew by %ld kB with the library and its first request\n", growth);
+    return 0;
+}

@@ -1,0 +1,50 @@
+#!/usr/bin/env bash
+# Every file that a page names, and every link to another page, is there. Of the pages
+# that say how the tree is changed, every name of the code is, too.
+# Usage: names.sh SOURCE_DIRECTORY
+set -euo pipefail
+cd "$1"
+
+failures=0
+missing() { # PAGE NAME
+    echo "$1: there is no $2"
+    failures=$((failures + 1))
+}
+mapfile -t tree < <(find . \( -name .git -o -path ./build \) -prune -o -type f -printf '%P\n')
+declare -A names=() tops=()
+for file in "${tree[@]}"; do
+    names[${file##*/}]=1
+    tops[${file%%/*}]=1
+done
+in_tree() { # a path of the tree, with wildcards; words such as TARGET stand for any
+    local path
+    path=$(sed -E 's/TARGET|NAME|WHY/*/g' <<<"$1")
+    compgen -G "$path" >/dev/null || compgen -G "$path.in" >/dev/null
+}
+
+pages=(README.md SECURITY.md CHANGELOG.md docs/*.md)
+for page in "${pages[@]}"; do
+    while read -r link; do
+        [[ $link == *://* || $link == '#'* ]] && continue
+        [[ -e ${page%"${page##*/}"}${link%%#*} ]] || missing "$page" "$link"
+    done < <(grep -oP '\]\(\K[^)]+' "$page" || true)
+    while read -r name; do
+        if [[ $name == */* ]]; then
+            # Other directories than those of the tree are those of a machine.
+            [[ -n ${tops[${name%%/*}]:-} && -d ${name%%/*} ]] || continue
+            [[ $name == build/* ]] || in_tree "${name%/}" || missing "$page" "$name"
+        elif [[ $name =~ \.(cpp|h|mof|registration|md|sh|cmake|dot|svg)$ ]]; then
+            [[ -n ${names[$name]:-} || -n ${names[$name.in]:-} ]] || missing "$page" "$name"
+        fi
+    done < <(grep -oP '`\K[A-Za-z0-9_][A-Za-z0-9_.*/-]*(?=`)' "$page" || true)
+done
+
+# Names of the code: functions, types, members, CMake's variables.
+for page in docs/extending.md; do
+    while read -r name; do
+        [[ $name == */* || $name == *.* ]] && continue
+        grep -rqwF --exclude-dir=docs --exclude-dir=build --exclude-dir=.git -- "${name##*::}" . ||
+            missing "$page" "$name"
+    done < <(grep -oP '`\K[A-Za-z_][A-Za-z0-9_:]*(?=(\(\))?`)' "$page")
+done
+exit $((failures > 0))

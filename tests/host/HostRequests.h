@@ -1,0 +1,41 @@
+#pragma once
+
+#include <string>
+#include <vector>
+
+#include "StrictHost.h"
+#include "cimom/ObjectManager.h"
+
+/// Requests that are put to the embedded object manager and to the strict host alike,
+/// and their answers as text, so that the two can be compared.
+namespace strict {
+
+using Texts = std::vector<std::string>;
+
+enum class Operation {
+    enumerateNames,
+    enumerate,
+    get,
+    associatorNames,
+    associators,
+    referenceNames,
+    references
+};
+
+struct HostRequest {
+    Operation operation;
+    cimom::ObjectPath path;
+    std::string association;  ///< of association requests; empty: none named
+
+    [[nodiscard]] std::string name() const;
+};
+
+/// The status and, sorted, what came. A get that came to nothing is "not found" in
+/// both: what an object manager's client sees of it.
+Texts ask(cimom::ObjectManager& manager, const HostRequest& request);
+Texts ask(StrictHost& host, const HostRequest& request, const char** properties = nullptr);
+
+/// Every request for the classes and the instances that the manager's providers serve.
+std::vector<HostRequest> allRequests(cimom::ObjectManager& manager);
+
+}  // namespace strict

@@ -1,0 +1,359 @@
+// Both provider libraries in an object manager that forgives nothing, compared with
+// what the embedded object manager gives for the same machine.
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <filesystem>
+#include <fstream>
+#include <iterator>
+#include <memory>
+#include <thread>
+
+#include "HostRequests.h"
+#include "StrictHost.h"
+#include "Tree.h"
+#include "cimom/ObjectPathText.h"
+#include "support/TemporaryDirectory.h"
+
+namespace {
+
+using strict::HostRequest;
+using strict::Operation;
+using strict::StrictHost;
+using strict::Texts;
+using ::testing::ElementsAre;
+using ::testing::HasSubstr;
+using ::testing::IsEmpty;
+using Binding = StrictHost::Binding;
+using Contexts = StrictHost::Contexts;
+
+constexpr const char* hosted = "QVXZR_HostedDHCPPoint";
+const std::string schemaDirectory = ZR_SOURCE_DIR "/schema";
+const std::string libraryDirectory = ZR_BINARY_DIR "/lib/cmpi";
+const std::vector<std::string> registrationFiles{
+    schemaDirectory + "/DHCPClientProvider.registration",
+    schemaDirectory + "/DHCPClientNeighbours.registration"};
+
+class ProvidersInAStrictHostTest : public test::TreeTest {
+  protected:
+    struct Expectation {
+        HostRequest request;
+        Texts answer;
+    };
+
+    static void setMachine() {
+        const auto with = [](test::Json node, const char* address) {
+            node["properties"]["IPv4Address"] = address;
+            return node;
+        };
+        setTree(
+            {test::host(
+                 {with(test::dhcpInterface("eth0", {"192.0.2.1"}), "192.0.2.10"),
+                  with(test::dhcpInterface("eth1", {"192.0.2.1", "2001:db8::1"}), "192.0.2.11"),
+                  test::dhcpInterface("eth2"), with(test::staticInterface("eth3"), "192.0.2.13")}),
+             test::serviceProcessor(
+                 {with(test::dhcpInterface("bmc0", {"192.0.2.1"}), "192.0.2.20")})});
+        std::ofstream(dataDirectory() + "ifcfg-eth0") << "NAME=office\n";
+    }
+
+    static std::unique_ptr<cimom::ObjectManager> manage() {
+        return std::make_unique<cimom::ObjectManager>(
+            cimom::Configuration{{schemaDirectory},
+                                 {registrationFiles[0], registrationFiles[1]},
+                                 {libraryDirectory},
+                                 ""});
+    }
+
+    void SetUp() override {
+        setMachine();
+        static_cast<void>(strict::violations().take());
+        // The embedded object manager has to be gone before the host comes: a library
+        // knows one broker only.
+        manager_ = manage();
+        for (HostRequest& request : strict::allRequests(*manager_)) {
+            Texts answer = strict::ask(*manager_, request);
+            expected_.push_back({std::move(request), std::move(answer)});
+        }
+        manager_.reset();
+    }
+
+    void TearDown() override { EXPECT_THAT(strict::violations().take(), IsEmpty()); }
+
+    static StrictHost makeHost(Binding binding = Binding::now,
+                               Contexts contexts = Contexts::filled) {
+        return {schemaDirectory, registrationFiles, libraryDirectory, binding, contexts};
+    }
+
+    void expectTheSame(StrictHost& host, const char** properties = nullptr) const {
+        for (const Expectation& one : expected_) {
+            EXPECT_EQ(strict::ask(host, one.request, properties), one.answer) << one.request.name();
+        }
+    }
+
+    /// The paths that the requests get.
+    std::vector<cimom::ObjectPath> paths() const {
+        std::vector<cimom::ObjectPath> all;
+        for (const Expectation& one : expected_) {
+            if (one.request.operation == Operation::get) {
+                all.push_back(one.request.path);
+            }
+        }
+        return all;
+    }
+
+    /// Every operation with a path that no well-behaved client sends; what comes of it
+    /// is the provider's, as long as it does nothing that is noted.
+    static void survives(StrictHost& host, const cimom::ObjectPath& path) {
+        host.enumerateNames(path);
+        host.enumerate(path);
+        host.get(path);
+        host.modify({path, {{"ConfigurationName", cimom::Value::ofString("new")}}});
+        for (const char* association : {static_cast<const char*>(nullptr), "CIM_Dependency", hosted,
+                                        "QVXZR_DHCPElementSettingData", ""}) {
+            const StrictHost::Filter filter{association, nullptr, nullptr, nullptr};
+            host.associatorNames(path, filter);
+            host.associators(path, filter);
+            host.referenceNames(path, filter);
+            host.references(path, filter);
+        }
+        for (const std::string& text : strict::violations().take()) {
+            // See AReferenceOfAnEndpointThatThereIsNotLacksItsKey.
+            EXPECT_THAT(text, HasSubstr("without Dependent is delivered: root/cimv2:" +
+                                        std::string(hosted) + "."))
+                << cimom::toText(path);
+        }
+    }
+
+    static void put(cimom::ObjectPath& path, const char* name, const cimom::Value& value) {
+        for (cimom::NamedValue& key : path.keys) {
+            if (key.name == name) {
+                key.value = value;
+            }
+        }
+    }
+
+    std::unique_ptr<cimom::ObjectManager> manager_;
+    std::vector<Expectation> expected_;
+};
+
+TEST_F(ProvidersInAStrictHostTest, AnswerEveryRequestAsInTheEmbeddedObjectManager) {
+    ASSERT_GT(expected_.size(), 500U);
+    StrictHost host = makeHost();
+    expectTheSame(host);
+}
+
+TEST_F(ProvidersInAStrictHostTest, AnswerTheSameWhenSymbolsAreBoundLateAndContextsAreEmpty) {
+    StrictHost host = makeHost(Binding::lazy, Contexts::empty);
+    expectTheSame(host);
+}
+
+TEST_F(ProvidersInAStrictHostTest, AnswerTheSameOverTheFullSchemaWithItsDefaults) {
+    const ZR::Testing::TemporaryDirectory directory;
+    for (const char* file :
+         {"schema/01-qualifiers.mof", "tests/schema/cim-2.41.mof", "schema/10-dhcp-client.mof"}) {
+        const std::filesystem::path source = std::filesystem::path(ZR_SOURCE_DIR) / file;
+        std::filesystem::copy(
+            source, directory / (source.filename() == "cim-2.41.mof" ? "02-cim-2.41.mof"
+                                                                     : source.filename().string()));
+    }
+    StrictHost host(directory.path().string(), registrationFiles, libraryDirectory);
+    expectTheSame(host);
+}
+
+TEST_F(ProvidersInAStrictHostTest, AnswerTheSameWhateverThePropertyList) {
+    StrictHost host = makeHost();
+    const char* none[] = {nullptr};
+    const char* some[] = {"Name", "NoSuchProperty", nullptr};
+    expectTheSame(host, none);
+    expectTheSame(host, some);
+}
+
+TEST_F(ProvidersInAStrictHostTest, AreUnloadedWhenIdleAndAnswerTheSameWhenLoadedAgain) {
+    StrictHost host = makeHost();
+    for (int round = 0; round < 3; ++round) {
+        for (std::size_t i = 0; i < expected_.size(); i += 7) {
+            EXPECT_EQ(strict::ask(host, expected_[i].request), expected_[i].answer)
+                << expected_[i].request.name();
+        }
+        EXPECT_TRUE(host.unload()) << "a library stays in the process";
+        host.load();
+    }
+}
+
+TEST_F(ProvidersInAStrictHostTest, AnswerManyThreadsAtOnce) {
+    StrictHost host = makeHost();
+    std::atomic<int> wrong = 0;
+    std::vector<std::thread> threads;
+    constexpr std::size_t threadCount = 8;
+    for (std::size_t number = 0; number < threadCount; ++number) {
+        threads.emplace_back([&, number] {
+            // Each asks a third of all, and all ask different things at a time.
+            for (std::size_t at = number % 3; at < expected_.size(); at += 3) {
+                const Expectation& one = expected_[at];
+                if (strict::ask(host, one.request) != one.answer) {
+                    ++wrong;
+                }
+            }
+        });
+    }
+    for (std::thread& thread : threads) {
+        thread.join();
+    }
+    EXPECT_EQ(wrong, 0);
+}
+
+TEST_F(ProvidersInAStrictHostTest, ChangeWhatTheyChangeInTheEmbeddedObjectManager) {
+    const auto changed = [](const cimom::ObjectPath& path) {
+        return cimom::Instance{path, {{"ConfigurationName", cimom::Value::ofString("new")}}};
+    };
+    std::vector<CMPIrc> codes;
+    std::vector<Texts> contents;
+    manager_ = manage();
+    for (const cimom::ObjectPath& path : paths()) {
+        codes.push_back(manager_->modifyInstance(changed(path)).status.code);
+        contents.push_back(strict::ask(*manager_, {Operation::get, path, ""}));
+    }
+    manager_.reset();
+    setMachine();
+    StrictHost host = makeHost();
+    std::size_t at = 0;
+    for (const cimom::ObjectPath& path : paths()) {
+        EXPECT_EQ(host.modify(changed(path)).code, codes[at]) << cimom::toText(path);
+        EXPECT_EQ(strict::ask(host, {Operation::get, path, ""}), contents[at]);
+        ++at;
+    }
+    const cimom::ObjectPath eth0 =
+        cimom::parseObjectPath("root/cimv2:QVXZR_DHCPSettingData.InstanceID=\"Computer%eth0\"");
+    const StrictHost::Answer answer = host.get(eth0);
+    ASSERT_EQ(answer.instances.size(), 1U);
+    EXPECT_EQ(*answer.instances[0].property("ConfigurationName"), cimom::Value::ofString("new"));
+}
+
+TEST_F(ProvidersInAStrictHostTest, AReferenceOfAnEndpointThatThereIsNotLacksItsKey) {
+    StrictHost host = makeHost();
+    for (const cimom::ObjectPath& path : paths()) {
+        if (path.className != "QVXZR_DHCPProtocolEndpoint") {
+            continue;
+        }
+        cimom::ObjectPath nobody = path;
+        put(nobody, "Name", cimom::Value::ofString(""));
+        EXPECT_EQ(host.referenceNames(nobody, {hosted, nullptr, nullptr, nullptr}).paths.size(),
+                  1U);
+        EXPECT_THAT(strict::violations().take(),
+                    ElementsAre(HasSubstr("A path without Dependent is delivered")));
+    }
+}
+
+TEST_F(ProvidersInAStrictHostTest, SurviveANumberAsTheNewConfigurationName) {
+    StrictHost host = makeHost();
+    cimom::Value number;
+    number.type = cimom::Type::uint64;
+    number.content = cimom::Scalar(std::uint64_t{7});
+    for (const cimom::ObjectPath& path : paths()) {
+        host.modify({path, {{"ConfigurationName", number}}});
+        host.modify(
+            {path, {{"ConfigurationName", cimom::Value::null(cimom::Type::string, false)}}});
+        host.modify({path, {}});
+    }
+}
+
+TEST_F(ProvidersInAStrictHostTest, RefuseToCreateDeleteAndQuery) {
+    StrictHost host = makeHost();
+    for (const cimom::ObjectPath& path : paths()) {
+        EXPECT_EQ(host.create({path, {}}).code, CMPI_RC_ERR_NOT_SUPPORTED);
+        EXPECT_EQ(host.remove(path).code, CMPI_RC_ERR_NOT_SUPPORTED);
+        EXPECT_EQ(host.query(path, "SELECT * FROM CIM_System", "WQL").code,
+                  CMPI_RC_ERR_NOT_SUPPORTED);
+    }
+}
+
+TEST_F(ProvidersInAStrictHostTest, OfferNoOtherKindsOfProviders) {
+    StrictHost host = makeHost();
+    for (const char* name : {"DHCPClientProvider", "DHCPClientNeighbours"}) {
+        for (const std::string kind : {"Method", "Property", "Indication"}) {
+            EXPECT_EQ(host.symbol(name, name + ("_Create_" + kind + "MI")), nullptr);
+            EXPECT_EQ(host.symbol(name, "_Generic_Create_" + kind + "MI"), nullptr);
+        }
+        EXPECT_EQ(host.symbol(name, "_Generic_Create_InstanceMI"), nullptr);
+    }
+}
+
+TEST_F(ProvidersInAStrictHostTest, ReferencesWithoutTheAssociationsOwnNameAreRefused) {
+    StrictHost host = makeHost();
+    for (const cimom::ObjectPath& path : paths()) {
+        for (const char* name : {static_cast<const char*>(nullptr), "CIM_Dependency"}) {
+            EXPECT_EQ(host.referenceNames(path, {name, nullptr, nullptr, nullptr}).code,
+                      CMPI_RC_ERR_INVALID_CLASS);
+            EXPECT_EQ(host.references(path, {name, nullptr, nullptr, nullptr}).code,
+                      CMPI_RC_ERR_INVALID_CLASS);
+        }
+    }
+}
+
+TEST_F(ProvidersInAStrictHostTest, SurviveKeysOfOtherTypesAndNullKeys) {
+    StrictHost host = makeHost();
+    cimom::Value number;
+    number.type = cimom::Type::uint64;
+    number.content = cimom::Scalar(std::uint64_t{4});
+    cimom::Value truth;
+    truth.type = cimom::Type::boolean;
+    truth.content = cimom::Scalar(true);
+    const cimom::Value null = cimom::Value::null(cimom::Type::string, false);
+    for (const cimom::ObjectPath& path : paths()) {
+        for (const cimom::Value& value : {number, truth, null, cimom::Value::ofString("")}) {
+            cimom::ObjectPath all = path;
+            for (cimom::NamedValue& key : all.keys) {
+                key.value = value;
+            }
+            survives(host, all);
+        }
+        for (std::size_t i = 0; i < path.keys.size(); ++i) {
+            cimom::ObjectPath one = path;
+            one.keys[i].value = i % 2 == 0 ? number : null;
+            survives(host, one);
+        }
+    }
+}
+
+TEST_F(ProvidersInAStrictHostTest, SurviveMissingExtraAndOddKeysAndClasses) {
+    StrictHost host = makeHost();
+    for (const cimom::ObjectPath& path : paths()) {
+        for (std::size_t i = 0; i < path.keys.size(); ++i) {
+            cimom::ObjectPath fewer = path;
+            fewer.keys.erase(fewer.keys.begin() + static_cast<std::ptrdiff_t>(i));
+            survives(host, fewer);
+        }
+        cimom::ObjectPath more = path;
+        more.keys.push_back({"Extra", cimom::Value::ofString("key")});
+        survives(host, more);
+        cimom::ObjectPath bare = path;
+        bare.keys.clear();
+        survives(host, bare);
+        cimom::ObjectPath nowhere = path;
+        nowhere.nameSpace.clear();
+        host.get(nowhere);
+        // What is made from it has no namespace, either.
+        for (const std::string& text : strict::violations().take()) {
+            EXPECT_THAT(text, HasSubstr("without namespace"));
+        }
+        cimom::ObjectPath unknown = path;
+        unknown.className = "No_Such_Class";
+        survives(host, unknown);
+    }
+}
+
+TEST_F(ProvidersInAStrictHostTest, KeysInLowerCaseNameTheSameInstance) {
+    StrictHost host = makeHost();
+    for (const Expectation& one : expected_) {
+        HostRequest request = one.request;
+        for (cimom::NamedValue& key : request.path.keys) {
+            std::transform(key.name.begin(), key.name.end(), key.name.begin(), [](char letter) {
+                return static_cast<char>(std::tolower(static_cast<unsigned char>(letter)));
+            });
+        }
+        EXPECT_EQ(strict::ask(host, request), one.answer) << request.name();
+    }
+}
+
+}  // namespace
