@@ -4,9 +4,12 @@
 #include <unistd.h>
 
 #include <array>
+#include <optional>
 #include <stdexcept>
 #include <type_traits>
+#include <utility>
 #include <variant>
+#include <vector>
 
 #include "Conversion.h"
 #include "ProviderCall.h"
@@ -191,9 +194,16 @@ ScriptAnswer ProviderHost::runDirectly(const ScriptRequest& request,
                 return table.enumerateInstances(instance_, context, result, record, nullptr);
         }
     };
-    const auto outcome = cimom::callProvider(
-        {&schema_, "", 0}, cimom::broker::ResultCollector::Kind::instances, "provider", path, ask);
-    return answerOf(outcome.status, outcome.delivery.instances);
+    std::vector<std::optional<cimom::Instance>> instances;
+    const cimom::Sink sink{
+        cimom::broker::ResultCollector::Kind::instances,
+        {nullptr,
+         [&](std::optional<cimom::Instance> each) { instances.push_back(std::move(each)); }},
+        [&] { return instances.size(); },
+        [&](std::size_t mark) { instances.resize(mark); }};
+    const cimom::CallOutcome outcome =
+        cimom::callProvider({&schema_, "", 0}, sink, "provider", path, ask);
+    return answerOf(outcome.status, instances);
 }
 
 }  // namespace test

@@ -32,6 +32,11 @@ RequestObjects::~RequestObjects() {
     current = outer_;
 }
 
+void RequestObjects::note(const char* function, const char* violation) {
+    std::string text(function);
+    violations().add(text.append(" ").append(violation));
+}
+
 void RequestObjects::keep(const void* record, std::shared_ptr<void> object) {
     if (current == nullptr) {
         violations().add("An object is made outside of any request");

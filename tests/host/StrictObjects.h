@@ -57,18 +57,19 @@ class RequestObjects {
     template <typename Object>
     static Object* get(const typename Object::Record* record, const char* function) {
         if (record == nullptr) {
-            violations().add(std::string(function) + " was given no object");
+            note(function, "was given no object");
             return nullptr;
         }
         void* found = find(record);
         if (found == nullptr || record->ft != &Object::table) {
-            violations().add(std::string(function) + " was given a dead or foreign object");
+            note(function, "was given a dead or foreign object");
             return nullptr;
         }
         return static_cast<Object*>(found);
     }
 
   private:
+    static void note(const char* function, const char* violation);
     static void keep(const void* record, std::shared_ptr<void> object);
     static void* find(const void* record);
 
