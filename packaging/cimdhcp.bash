@@ -84,8 +84,8 @@ _cimdhcp() {
             graph) options+=' --svg' ;;
             tree) options+=' --explain' ;;
             serve) options+=' --listen --tls-cert --tls-key --users --read-only --max-header-line
-                --max-headers --max-body --max-depth --max-connections --max-waiting
-                --max-enumerations --workers --io-threads --request-timeout --answer-timeout
+                --max-headers --max-body --max-depth --max-connections --max-waiting --max-stuck
+                --max-result --max-enumerations --workers --io-threads --request-timeout --answer-timeout
                 --enumeration-timeout --max-enumeration-timeout' ;;
             user) options+=' --users --modify' ;;
             associators) options+=' --names --assoc-class --result-class --role --result-role' ;;

@@ -68,7 +68,7 @@ done
 
 sed -E -e 's/^[0-9-]+T[0-9:.]+Z /T /' \
     -e 's/^(T [0-9]+ [^ ]+ [^ ]+):[0-9]+ /\1:N /' \
-    -e 's/\[Line: [0-9]+\]/[Line: N]/; s/at line [0-9]+ in/at line N in/' \
+    -e 's/Line: [0-9]+\]/Line: N]/; s/at line [0-9]+ in/at line N in/' \
     -e 's/=0x[0-9a-f]+/=ADDRESS/g; s/0x[0-9a-f]{6,}/ADDRESS/g' \
     -e "s/$(uname -n)/HOST/g" -e "s|$work|WORK|g" "$work/log" | LC_ALL=C sort -u >"$work/actual"
 if [[ ${UPDATE_EXPECTED:-} == yes ]]; then

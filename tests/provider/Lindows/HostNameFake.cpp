@@ -3,6 +3,8 @@
 #include <cerrno>
 #include <cstddef>
 
+#include "zrclient/InstrumentationService.h"
+
 namespace {
 
 bool fails = false;
@@ -26,6 +28,8 @@ int __wrap_gethostname(char* name, std::size_t size) {
 namespace test {
 
 HostNameFails::HostNameFails() {
+    // The machine itself is not read without its name.
+    static_cast<void>(ZR::InstrumentationService::process().current());
     fails = true;
 }
 HostNameFails::~HostNameFails() {

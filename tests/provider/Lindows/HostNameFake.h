@@ -6,6 +6,7 @@ namespace test {
 
 class HostNameFails {
   public:
+    /// From here on; the tree that was set is read before.
     HostNameFails();
     ~HostNameFails();
     HostNameFails(const HostNameFails&) = delete;
