@@ -20,9 +20,7 @@
 #include <libmnl/libmnl.h>
 #include <linux/rtnetlink.h>
 #include <net/if.h>
-#include <sched.h>
 #include <sys/ioctl.h>
-#include <sys/mount.h>
 #include <sys/socket.h>
 #include <sys/stat.h>
 #include <unistd.h>
@@ -41,6 +39,7 @@
 #include <vector>
 
 #include "Clients.h"
+#include "OwnMachine.h"
 #include "zrclient/Instrumentation.h"
 #include "zrclient/InstrumentationService.h"
 #include "zrclient/LiveSource.h"
@@ -51,20 +50,10 @@ namespace {
 using Clock = std::chrono::steady_clock;
 using ZR::NodeLexicon::NodeType;
 
-[[noreturn]] void fail(const char* what) {
-    std::perror(what);
-    std::exit(1);
-}
+using bench::fail;
 
-void enterOwnMachine() {
-    if (::unshare(CLONE_NEWNET | CLONE_NEWNS) != 0) {
-        fail("a namespace of its own needs root: unshare");
-    }
-    if (::mount("none", "/", nullptr, MS_REC | MS_PRIVATE, nullptr) != 0 ||
-        ::mount("tmpfs", "/run", "tmpfs", 0, nullptr) != 0 ||
-        ::mount("tmpfs", "/var/lib", "tmpfs", 0, nullptr) != 0) {
-        fail("mount");
-    }
+void enterMachineWithALease() {
+    bench::enterOwnMachine();
     // One client has left a lease.
     FILE* file = nullptr;
     if (::mkdir("/var/lib/dhcp", 0755) != 0 ||
@@ -84,24 +73,16 @@ void growTo(std::int64_t wanted) {
     if (wanted <= present) {
         return;
     }
-    FILE* const ip = ::popen("ip -batch -", "w");
-    if (ip == nullptr) {
-        fail("ip");
-    }
+    std::string lines;
     for (; present < wanted; ++present) {
-        const auto number = static_cast<int>(present);
-        if (number == 0) {
-            std::fputs("link add b0 type bridge\n", ip);
-        } else {
-            std::fprintf(ip, "link add b%d link b0 type macvlan mode bridge\n", number);
-        }
-        std::fprintf(ip, "addr add 10.%d.%d.%d/32 dev b%d\n", number / 62500, number / 250 % 250,
-                     number % 250 + 1, number);
+        const std::string link = "b" + std::to_string(present);
+        lines += "link add " + link;
+        lines += present == 0 ? " type bridge\n" : " link b0 type macvlan mode bridge\n";
+        lines += "addr add 10." + std::to_string(present / 62500) + "." +
+                 std::to_string(present / 250 % 250) + "." + std::to_string(present % 250 + 1) +
+                 "/32 dev " + link + "\n";
     }
-    if (::pclose(ip) != 0) {
-        std::fprintf(stderr, "the links cannot be made\n");
-        std::exit(1);
-    }
+    bench::configureLinks(lines);
 }
 
 /// Changes one link, so that the kernel tells of it.
@@ -396,7 +377,7 @@ int main(int argc, char** argv) {
     if (benchmark::ReportUnrecognizedArguments(argc, argv)) {
         return 2;
     }
-    enterOwnMachine();
+    enterMachineWithALease();
     RememberingReporter reporter;
     benchmark::RunSpecifiedBenchmarks(&reporter);
     printRatios(reporter.microseconds);

@@ -9,9 +9,6 @@
 #include <benchmark/benchmark.h>
 #include <dlfcn.h>
 #include <malloc.h>
-#include <sched.h>
-#include <sys/mount.h>
-#include <unistd.h>
 
 #include <cstdio>
 #include <cstdlib>
@@ -21,41 +18,23 @@
 #include <string>
 #include <vector>
 
+#include "OwnMachine.h"
 #include "cimom/ObjectManager.h"
 
 namespace {
 
 constexpr std::size_t interfaces = 4;
 
-[[noreturn]] void fail(const char* what) {
-    std::perror(what);
-    std::exit(1);
-}
-
-void enterOwnMachine() {
-    if (::unshare(CLONE_NEWNET | CLONE_NEWNS) != 0) {
-        fail("a namespace of its own needs root: unshare");
-    }
-    if (::mount("none", "/", nullptr, MS_REC | MS_PRIVATE, nullptr) != 0 ||
-        ::mount("tmpfs", "/run", "tmpfs", 0, nullptr) != 0 ||
-        ::mount("tmpfs", "/var/lib", "tmpfs", 0, nullptr) != 0) {
-        fail("mount");
-    }
-    FILE* const ip = ::popen("ip -batch -", "w");
-    if (ip == nullptr) {
-        fail("ip");
-    }
+void enterMachineOfFour() {
+    bench::enterOwnMachine();
+    std::string lines;
     for (std::size_t i = 0; i < interfaces; ++i) {
         // A finite lifetime is the kernel's own sign of an address by DHCP.
-        std::fprintf(ip,
-                     "link add b%zu type bridge\nlink set b%zu up\n"
-                     "addr add 192.0.2.%zu/32 dev b%zu valid_lft 600 preferred_lft 600\n",
-                     i, i, i + 1, i);
+        const std::string link = "b" + std::to_string(i);
+        lines += "link add " + link + " type bridge\nlink set " + link + " up\naddr add 192.0.2." +
+                 std::to_string(i + 1) + "/32 dev " + link + " valid_lft 600 preferred_lft 600\n";
     }
-    if (::pclose(ip) != 0) {
-        std::fprintf(stderr, "the links cannot be made\n");
-        std::exit(1);
-    }
+    bench::configureLinks(lines);
     ::setenv("ZR_LOG_SINK", "none", 1);
     ::setenv("ZR_TRACE_SINK", "none", 1);
 }
@@ -78,7 +57,7 @@ long residentKilobytes() {
             return value;
         }
     }
-    fail("/proc/self/smaps_rollup");
+    bench::fail("/proc/self/smaps_rollup");
 }
 
 /// Asks the first request of a manager, which loads the library for it.
@@ -145,7 +124,7 @@ class Reporter : public benchmark::ConsoleReporter {
 }  // namespace
 
 int main(int argc, char** argv) {
-    enterOwnMachine();
+    enterMachineOfFour();
     const long growth = growthOfFirstLoad();
     benchmark::RegisterBenchmark("bare load", bareLoad)->Unit(benchmark::kMicrosecond);
     benchmark::RegisterBenchmark("load to first answer", firstAnswer)

@@ -1,0 +1,19 @@
+#pragma once
+
+#include <string>
+
+/// What the benchmarks of the live machine share: a network of their own to read.
+namespace bench {
+
+/// Tells what failed and why, after errno, and ends the program.
+[[noreturn]] void fail(const char* what);
+
+/// Takes the process into a network namespace without links, and hides behind empty
+/// directories where DHCP clients leave their traces. Needs root; ends the program when
+/// it may not.
+void enterOwnMachine();
+
+/// Carries out lines of ip(8) as one batch. Ends the program when one fails.
+void configureLinks(const std::string& lines);
+
+}  // namespace bench
