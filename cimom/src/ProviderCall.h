@@ -53,7 +53,7 @@ class PropertyNames {
 
 /// Where the objects of a request's calls go.
 struct Sink {
-    broker::ResultCollector::Kind kind;
+    broker::ResultCollector::Kind kind = broker::ResultCollector::Kind::instances;
     broker::Consumer consumer;
     std::function<std::size_t()> mark;
     std::function<void(std::size_t)> backTo;  ///< as those of a Receiver

@@ -21,7 +21,7 @@ namespace cimom::wbem {
 struct Request {
     ObjectManager& manager;
     EnumerationSessions& sessions;
-    std::size_t largestResult;
+    std::size_t largestResult = 0;  ///< bytes
     const Operations::ModificationLog& log;
     const Call& call;
     const Caller& caller;
