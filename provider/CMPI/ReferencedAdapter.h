@@ -64,8 +64,7 @@ class ReferencedAdapter {
     /// Stands on exactly the instance that the path names. Throws ProviderException
     /// when the object manager has none.
     template <typename Singly = Row>
-    void setSingleObjectPath(const CMPIObjectPath* objectPath) {
-        static_assert(Singly::fetchesSingly);
+    requires Singly::fetchesSingly void setSingleObjectPath(const CMPIObjectPath* objectPath) {
         const ParameterScope scope(Row::trace.at(__func__), " objectPath=", objectPath);
         instance_ = getReferenced(_broker, _context, objectPath);
         first_ = true;

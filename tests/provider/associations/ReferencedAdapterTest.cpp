@@ -81,6 +81,17 @@ class ReferencedAdapterTest : public test::TreeTest {
     Host host_{Host::Neighbours::served, Host::Calls::counted};
 };
 
+template <typename Adapter>
+constexpr bool standsOnOneByItsPath = requires(Adapter& adapter, const CMPIObjectPath* path) {
+    adapter.setSingleObjectPath(path);
+};
+
+TEST(ReferencedAdapters, OnlyComputersAreNeverFetchedSingly) {
+    EXPECT_TRUE(standsOnOneByItsPath<CMPIDHCPAssignmentSettingData>);
+    EXPECT_TRUE(standsOnOneByItsPath<CMPIIPProtocolEndpoint>);
+    EXPECT_FALSE(standsOnOneByItsPath<CMPIDHCPComputerSystem>);
+}
+
 TEST_F(ReferencedAdapterTest, ClassWithoutInstancesIsAnEmptyWalkAndNoFailure) {
     setTree({});
     with<CMPIDHCPComputerSystem>("QVXZR_ComputerSystem", [](auto& adapter, auto* path) {
