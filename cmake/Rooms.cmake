@@ -98,10 +98,12 @@ function(zr_test_headers)
     target_precompile_headers(test_headers PRIVATE <gmock/gmock.h> <gtest/gtest.h>)
 endfunction()
 
-# zr_test(NAME SOURCES file... [LINKS target...] [LABELS label...] [ENVIRONMENT NAME=value...])
-# One test program; each of its tests is a test of its own to ctest.
+# zr_test(NAME SOURCES file... [LINKS target...] [LABELS label...] [ENVIRONMENT NAME=value...]
+#         [SERIAL])
+# One test program; each of its tests is a test of its own to ctest. SERIAL: no other
+# test runs meanwhile.
 function(zr_test name)
-    cmake_parse_arguments(TEST "" "" "SOURCES;LINKS;LABELS;ENVIRONMENT" ${ARGN})
+    cmake_parse_arguments(TEST "SERIAL" "" "SOURCES;LINKS;LABELS;ENVIRONMENT" ${ARGN})
     if(NOT TARGET test_headers)
         zr_test_headers()
     endif()
@@ -115,6 +117,9 @@ function(zr_test name)
     target_compile_definitions(${name} PRIVATE ZR_SOURCE_DIR="${PROJECT_SOURCE_DIR}"
                                ZR_BINARY_DIR="${PROJECT_BINARY_DIR}")
     set(properties TIMEOUT 120)
+    if(TEST_SERIAL)
+        list(APPEND properties RUN_SERIAL TRUE)
+    endif()
     if(TEST_LABELS)
         list(APPEND properties LABELS "${TEST_LABELS}")
     endif()

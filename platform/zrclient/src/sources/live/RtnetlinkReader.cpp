@@ -35,6 +35,11 @@ int errorIn(std::optional<std::int32_t> code) {
     return code && *code < 0 && *code != INT32_MIN ? -*code : EBADMSG;
 }
 
+/// A deadline moved by so long; one that never comes stays so.
+Deadline later(Deadline deadline, std::chrono::steady_clock::duration by) {
+    return deadline > Deadline::max() - by ? Deadline::max() : deadline + by;
+}
+
 }  // namespace
 
 /// How one dump ended.
@@ -110,7 +115,7 @@ RtnetlinkReader::Outcome RtnetlinkReader::dumpOnce(std::uint16_t request, Parse 
     // refuses another dump while one is going on: such a socket is not used again.
     open_ = false;
     for (;;) {
-        const Datagram datagram = transport_->receive(buffer_, deadline + held_);
+        const Datagram datagram = transport_->receive(buffer_, later(deadline, held_));
         if (datagram.error == ENOBUFS) {
             outcome.end = End::Lost;
             outcome.reason = "parts of the answer were lost";
@@ -135,7 +140,7 @@ RtnetlinkReader::Outcome RtnetlinkReader::dumpOnce(std::uint16_t request, Parse 
             open_ = outcome.end == End::Complete || outcome.end == End::Interrupted;
             return outcome;
         }
-        if (std::chrono::steady_clock::now() >= deadline + held_) {
+        if (std::chrono::steady_clock::now() >= later(deadline, held_)) {
             outcome.reason = "no complete answer in time";
             return outcome;
         }
