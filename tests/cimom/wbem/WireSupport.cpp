@@ -1,6 +1,7 @@
 #include "WireSupport.h"
 
 #include <arpa/inet.h>
+#include <poll.h>
 #include <sys/socket.h>
 #include <unistd.h>
 
@@ -183,6 +184,11 @@ std::optional<HttpResponse> RawClient::receive() {
 bool RawClient::awaitAnswer() {
     std::array<char, 1> byte{};
     return ::recv(fd_, byte.data(), byte.size(), MSG_PEEK) == 1;
+}
+
+bool RawClient::isAnsweredWithin(std::chrono::milliseconds time) {
+    pollfd wanted{fd_, POLLIN, 0};
+    return ::poll(&wanted, 1, static_cast<int>(time.count())) == 1 && awaitAnswer();
 }
 
 std::optional<HttpResponse> RawClient::receiveAny() {

@@ -3,6 +3,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <chrono>
 #include <cstdint>
 #include <mutex>
 #include <optional>
@@ -64,6 +65,8 @@ class RawClient {
     std::optional<HttpResponse> receive();
     /// Waits until an answer begins to arrive, and reads nothing of it.
     bool awaitAnswer();
+    /// Whether anything of an answer arrives in that time; reads nothing of it.
+    bool isAnsweredWithin(std::chrono::milliseconds time);
     /// Waits for the server to close the connection; false after ten seconds.
     bool waitForEnd();
 

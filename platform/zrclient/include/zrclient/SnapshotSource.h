@@ -26,7 +26,7 @@ class SnapshotSource {
 
     /// Reads the present state. Never returns null: what cannot be read is logged and
     /// left out. Throws nothing but std::bad_alloc, after which changed() is true.
-    /// Takes at most 250 ms.
+    /// Waits for answers, as of the kernel or a bus, somewhat over a second at most.
     [[nodiscard]] virtual std::shared_ptr<const Snapshot> read() = 0;
 };
 

@@ -52,8 +52,7 @@ constexpr std::array ifcfgPlaces{ClientPlace{ifcfgDirectories[0], ifcfgPrefix},
                                  ClientPlace{ifcfgDirectories[1], ifcfgPrefix}};
 
 // Managers before the clients that they may start, and those before what is left of
-// the boot. The files of /proc
-// cannot be watched.
+// the boot. The files of /proc cannot be watched.
 constexpr std::array sources{
     ClientSource{readProcesses, dhcp6cPlaces},
     ClientSource{readNetworkd, networkdPlaces},
