@@ -1,0 +1,42 @@
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <span>
+#include <string_view>
+
+#include "Machine.h"
+#include "zrclient/NodeLexicon.h"
+#include "zrclient/Snapshot.h"
+
+namespace ZR::Live {
+
+/// What a value was taken from. All empty: the kernel's links and addresses. Borrows
+/// the facts.
+struct Origin {
+    std::optional<Client> client;
+    std::string_view file;
+    std::int32_t pid = 0;  ///< of a process; 0 for none
+
+    bool operator==(const Origin&) const = default;
+};
+
+/// A value, and what it was taken from.
+struct Finding {
+    PropertyValue value;
+    Origin origin{};
+};
+
+/// One row of the precedence table: where the value of a property may come from.
+struct DecisionRow {
+    NodeLexicon::Properties property;
+    std::string_view reason;
+    /// nullopt: this row cannot tell, the next one of the property is asked.
+    std::optional<Finding> (*answer)(const InterfaceView& view);
+};
+
+/// The precedence table: of each property the first row that answers counts. A
+/// property that no row answers is left out.
+[[nodiscard]] std::span<const DecisionRow> precedence();
+
+}  // namespace ZR::Live

@@ -1,0 +1,46 @@
+#pragma once
+
+#include <systemd/sd-bus.h>
+
+#include <string>
+
+namespace ZR::Live {
+
+/// The functions of libsystemd that a question over the system bus needs. The library is
+/// loaded with the first question, not with this code: with what it stands on
+/// (compression, ciphers) it would double what a process pays for the provider, where
+/// most machines have nobody on the bus who is asked.
+class SdBus {
+  public:
+    /// Those of this process, loaded by the first call and kept until this code itself is
+    /// unloaded. Any thread.
+    [[nodiscard]] static const SdBus& get();
+
+    /// Those of a library, by the name that the loader finds it by.
+    explicit SdBus(const char* library);
+    ~SdBus();
+    SdBus(const SdBus&) = delete;
+    SdBus& operator=(const SdBus&) = delete;
+
+    /// Why the functions cannot be had; empty when they can. Only then may they be called.
+    [[nodiscard]] const std::string& missing() const noexcept { return missing_; }
+
+    decltype(&::sd_bus_open_system) openSystem = nullptr;
+    decltype(&::sd_bus_close_unref) closeUnref = nullptr;
+    decltype(&::sd_bus_is_ready) isReady = nullptr;
+    decltype(&::sd_bus_process) process = nullptr;
+    decltype(&::sd_bus_wait) wait = nullptr;
+    decltype(&::sd_bus_call) call = nullptr;
+    decltype(&::sd_bus_message_new_method_call) newMethodCall = nullptr;
+    decltype(&::sd_bus_message_set_auto_start) setAutoStart = nullptr;
+    decltype(&::sd_bus_message_read_basic) readBasic = nullptr;
+    decltype(&::sd_bus_message_unref) messageUnref = nullptr;
+    decltype(&::sd_bus_error_has_name) errorHasName = nullptr;
+    decltype(&::sd_bus_error_free) errorFree = nullptr;
+
+  private:
+    void* handle_;
+    std::string missing_;
+};
+
+}  // namespace ZR::Live
