@@ -6,7 +6,6 @@
 #include <cerrno>
 #include <cstdlib>
 #include <cstring>
-#include <nlohmann/json.hpp>
 #include <optional>
 #include <sstream>
 #include <utility>
@@ -16,7 +15,6 @@
 #include "cimdhcp/EmbeddedClient.h"
 #include "cimdhcp/Failure.h"
 #include "cimdhcp/HiddenClients.h"
-#include "cimdhcp/JsonFormat.h"
 #include "cimdhcp/PlatformSetup.h"
 #include "zrclient/InstrumentationService.h"
 #include "zrcommon/PlatformSettings.h"
@@ -29,10 +27,6 @@ namespace fs = std::filesystem;
 using Verdict = Finding::Verdict;
 using ZR::NodeLexicon::NodeType;
 using ZR::NodeLexicon::Properties;
-
-std::string counted(std::size_t count, const std::string& one, const std::string& several) {
-    return std::to_string(count) + ' ' + (count == 1 ? one : several);
-}
 
 /// What was found, part after part.
 class Examination {
@@ -281,12 +275,9 @@ class Examination {
         }
     }
 
-    /// The object manager begins what it says of a library with the library's file.
     void reportFactory(const char* what, const cimom::Registration& registration,
                        const cimom::Status& status) {
-        const bool bad =
-            status.message.find("lib" + registration.location + ".so: ") != std::string::npos;
-        if (bad) {
+        if (status.noProvider) {
             add(Verdict::bad, what, printable(status.message),
                 "ldd shows libraries that are missing; else install the provider again");
         } else {
@@ -332,73 +323,10 @@ class Examination {
     std::size_t dhcpInterfaces_ = 0;
 };
 
-const char* markOf(Verdict verdict) {
-    switch (verdict) {
-        case Verdict::good:
-            return "ok  ";
-        case Verdict::notable:
-            return "note";
-        case Verdict::bad:
-            break;
-    }
-    return "BAD ";
-}
-
-const char* nameOf(Verdict verdict) {
-    switch (verdict) {
-        case Verdict::good:
-            return "good";
-        case Verdict::notable:
-            return "notable";
-        case Verdict::bad:
-            break;
-    }
-    return "bad";
-}
-
-std::size_t countOf(const std::vector<Finding>& findings, Verdict verdict) {
-    return static_cast<std::size_t>(
-        std::count_if(findings.begin(), findings.end(),
-                      [verdict](const Finding& each) { return each.verdict == verdict; }));
-}
-
 }  // namespace
 
 std::vector<Finding> check(const Options& options, const std::vector<Directories>& installations) {
     return Examination(options, installations).examine();
-}
-
-std::string checkText(const std::vector<Finding>& findings) {
-    std::string text;
-    for (const Finding& finding : findings) {
-        text += std::string(markOf(finding.verdict)) + "  " + finding.what + ": " + finding.detail +
-                '\n';
-        if (!finding.remedy.empty()) {
-            text += "      -> " + finding.remedy + '\n';
-        }
-    }
-    const std::size_t bad = countOf(findings, Verdict::bad);
-    const std::size_t notable = countOf(findings, Verdict::notable);
-    return text +
-           (bad == 0 ? "Nothing is wrong" : counted(bad, "thing is wrong", "things are wrong")) +
-           (notable == 0 ? "" : "; " + counted(notable, "is worth a look", "are worth a look")) +
-           ".\n";
-}
-
-std::string checkJson(const std::vector<Finding>& findings) {
-    auto list = nlohmann::ordered_json::array();
-    for (const Finding& finding : findings) {
-        list.push_back({{"verdict", nameOf(finding.verdict)},
-                        {"what", finding.what},
-                        {"detail", finding.detail},
-                        {"remedy", finding.remedy}});
-    }
-    return jsonText({{"findings", std::move(list)}});
-}
-
-bool isGood(const std::vector<Finding>& findings) noexcept {
-    return std::none_of(findings.begin(), findings.end(),
-                        [](const Finding& each) { return each.verdict == Verdict::bad; });
 }
 
 }  // namespace cimdhcp

@@ -10,6 +10,7 @@
 #include "cimdhcp/Failure.h"
 #include "cimdhcp/HelpFormatter.h"
 #include "cimdhcp/OptionGroups.h"
+#include "cimdhcp/ServeOptions.h"
 
 namespace cimdhcp {
 
@@ -60,7 +61,6 @@ constexpr const char* machineGroup = "The machine";
 constexpr const char* classGroup = "Classes and instances";
 constexpr const char* associationGroup = "Associations";
 constexpr const char* serverGroup = "The WBEM server";
-constexpr const char* limitGroup = "Limits of what a client may cost; none can be switched off";
 constexpr const char* advancedGroup = "Advanced options";
 
 /// Whether an option of the program or of any command takes a value.
@@ -95,10 +95,30 @@ std::vector<std::string> withEmptyValues(const CLI::App& app,
     return result;
 }
 
-/// The options of a command line while they are being read.
-class Reader {
+/// What stands behind the commands' names while a line is being read.
+struct Records {
+    ShowCommand show;
+    RenameCommand rename;
+    GraphCommand graph;
+    TreeCommand tree;
+    ClassesCommand classes;
+    NamesCommand names;
+    InstancesCommand instances;
+    GetCommand get;
+    ModifyCommand modify;
+    AssociatorsCommand associators;
+    ReferencesCommand references;
+    ServeCommand serve;
+    UserAddCommand userAdd;
+    CheckCommand check;
+};
+
+}  // namespace
+
+/// The parser, and where it puts what it reads.
+class CommandLineReader::Parser {
   public:
-    Reader() : app_(description, "cimdhcp") {
+    Parser() : app_(description, "cimdhcp") {
         app_.formatter(std::make_shared<HelpFormatter>());
         app_.set_version_flag("--version", "cimdhcp " CIMDHCP_VERSION, "Print the version");
         app_.set_help_flag("-h,--help", "Print this help");
@@ -116,6 +136,8 @@ class Reader {
     }
 
     std::variant<CommandLine, Information> read(const std::vector<std::string>& arguments) {
+        line_ = {};
+        records_ = {};
         try {
             // The parser takes them from the end.
             const std::vector<std::string> whole = withEmptyValues(app_, arguments);
@@ -201,134 +223,88 @@ class Reader {
     }
 
     void addMachineCommands() {
-        command("show", machineGroup, "The network interfaces and their DHCP clients", show_);
-        CLI::App* const rename =
-            command("rename", machineGroup, "Change an interface's configuration name", rename_);
-        rename->add_option("INTERFACE", rename_.interfaceName, "The interface, such as eth0")
+        command("show", machineGroup, "The network interfaces and their DHCP clients",
+                records_.show);
+        CLI::App* const rename = command(
+            "rename", machineGroup, "Change an interface's configuration name", records_.rename);
+        rename
+            ->add_option("INTERFACE", records_.rename.interfaceName, "The interface, such as eth0")
             ->required();
-        rename->add_option("NAME", rename_.name, "The new configuration name")->required();
-        rename->add_flag("--create", rename_.create,
+        rename->add_option("NAME", records_.rename.name, "The new configuration name")->required();
+        rename->add_flag("--create", records_.rename.create,
                          "Make the interface's configuration file if there is none");
-        CLI::App* const graph =
-            command("graph", machineGroup, "Instances and associations, for Graphviz", graph_);
-        graph->add_flag("--svg", graph_.svg, "Draw it as SVG (needs the package graphviz)");
-        CLI::App* const tree =
-            command("tree", machineGroup, "What is known of the machine, as a JSON tree", tree_);
-        tree->add_flag("--explain", tree_.explain,
+        CLI::App* const graph = command("graph", machineGroup,
+                                        "Instances and associations, for Graphviz", records_.graph);
+        graph->add_flag("--svg", records_.graph.svg, "Draw it as SVG (needs the package graphviz)");
+        CLI::App* const tree = command(
+            "tree", machineGroup, "What is known of the machine, as a JSON tree", records_.tree);
+        tree->add_flag("--explain", records_.tree.explain,
                        "With each property, where it came from and why that counts");
     }
 
     void addInstanceCommands() {
-        command("classes", classGroup, "The served classes", classes_);
+        command("classes", classGroup, "The served classes", records_.classes);
         CLI::App* const names =
-            command("names", classGroup, "The paths of a class' instances", names_);
-        names->add_option("CLASS", names_.className, "The class, or a parent of it")->required();
-        CLI::App* const instances =
-            command("instances", classGroup, "The instances of a class", instances_);
-        instances->add_option("CLASS", instances_.className, "The class, or a parent of it")
+            command("names", classGroup, "The paths of a class' instances", records_.names);
+        names->add_option("CLASS", records_.names.className, "The class, or a parent of it")
             ->required();
-        CLI::App* const get = command("get", classGroup, "One instance", get_);
-        addPath(get, get_.path);
+        CLI::App* const instances =
+            command("instances", classGroup, "The instances of a class", records_.instances);
+        instances->add_option("CLASS", records_.instances.className, "The class, or a parent of it")
+            ->required();
+        CLI::App* const get = command("get", classGroup, "One instance", records_.get);
+        addPath(get, records_.get.path);
         CLI::App* const modify =
-            command("modify", classGroup, "Change properties of an instance", modify_);
-        addPath(modify, modify_.path);
+            command("modify", classGroup, "Change properties of an instance", records_.modify);
+        addPath(modify, records_.modify.path);
         modify
-            ->add_option("PROPERTY=VALUE", modify_.assignments,
+            ->add_option("PROPERTY=VALUE", records_.modify.assignments,
                          "What to change; an array is {VALUE, VALUE...}")
             ->required();
     }
 
     void addAssociationCommands() {
-        CLI::App* const associators = command("associators", associationGroup,
-                                              "What is associated with an instance", associators_);
-        addPath(associators, associators_.path);
-        associators->add_flag("--names", associators_.names, "Their paths alone");
-        addFilter(associators, "--assoc-class", associators_.assocClass, "CLASS",
+        CLI::App* const associators =
+            command("associators", associationGroup, "What is associated with an instance",
+                    records_.associators);
+        addPath(associators, records_.associators.path);
+        associators->add_flag("--names", records_.associators.names, "Their paths alone");
+        addFilter(associators, "--assoc-class", records_.associators.assocClass, "CLASS",
                   "Through associations of this class only");
-        addFilter(associators, "--result-class", associators_.resultClass, "CLASS",
+        addFilter(associators, "--result-class", records_.associators.resultClass, "CLASS",
                   "Instances of this class only");
-        addFilter(associators, "--role", associators_.role, "PROPERTY",
+        addFilter(associators, "--role", records_.associators.role, "PROPERTY",
                   "Only where PATH stands in this reference");
-        addFilter(associators, "--result-role", associators_.resultRole, "PROPERTY",
+        addFilter(associators, "--result-role", records_.associators.resultRole, "PROPERTY",
                   "Only what stands in this reference");
-        CLI::App* const references =
-            command("references", associationGroup, "The associations of an instance", references_);
-        addPath(references, references_.path);
-        references->add_flag("--names", references_.names, "Their paths alone");
-        addFilter(references, "--result-class", references_.resultClass, "CLASS",
+        CLI::App* const references = command(
+            "references", associationGroup, "The associations of an instance", records_.references);
+        addPath(references, records_.references.path);
+        references->add_flag("--names", records_.references.names, "Their paths alone");
+        addFilter(references, "--result-class", records_.references.resultClass, "CLASS",
                   "Associations of this class only");
-        addFilter(references, "--role", references_.role, "PROPERTY",
+        addFilter(references, "--role", records_.references.role, "PROPERTY",
                   "Only where PATH stands in this reference");
     }
 
     void addServerCommands() {
         CLI::App* const serve =
-            command("serve", serverGroup, "Answer WBEM clients: CIM-XML over HTTP", serve_);
-        command("check", serverGroup, "Tell why something is empty or does not work", check_);
-        addServeOptions(serve);
-        addLimits(serve);
+            command("serve", serverGroup, "Answer WBEM clients: CIM-XML over HTTP", records_.serve);
+        command("check", serverGroup, "Tell why something is empty or does not work",
+                records_.check);
+        addServeOptions(*serve, records_.serve);
         CLI::App* const user = app_.add_subcommand("user", "The users of the server");
         user->group(serverGroup)->require_subcommand(1);
         CLI::App* const add = user->add_subcommand(
             "add",
             "Add a user, or change role and password.\nThe password is asked for, or read from "
             "standard input.");
-        add->callback([this] { line_.command = userAdd_; });
-        add->add_option("NAME", userAdd_.name, "The user")->required();
-        add->add_option("--users", userAdd_.users, "The users file; made if there is none")
+        add->callback([this] { line_.command = records_.userAdd; });
+        add->add_option("NAME", records_.userAdd.name, "The user")->required();
+        add->add_option("--users", records_.userAdd.users, "The users file; made if there is none")
             ->type_name("FILE")
             ->required();
-        add->add_flag("--modify", userAdd_.mayModify, "The user may modify, not only read");
-    }
-
-    void addServeOptions(CLI::App* serve) {
-        serve
-            ->add_option("--listen", serve_.listen,
-                         "Where to listen; 127.0.0.1 if nothing is said. Any address that other "
-                         "machines reach needs TLS and users")
-            ->type_name("ADDRESS[:PORT]");
-        addFilter(serve, "--tls-cert", serve_.tlsCertificate, "FILE",
-                  "The certificate with its chain (PEM); the port is then 5989");
-        addFilter(serve, "--tls-key", serve_.tlsKey, "FILE", "Its private key (PEM)");
-        addFilter(serve, "--users", serve_.users, "FILE",
-                  "Only these users, made by \"cimdhcp user add\"");
-        serve->add_flag("--read-only", serve_.readOnly, "Nobody may modify");
-    }
-
-    void addLimits(CLI::App* serve) {
-        cimom::wbem::Limits& limits = serve_.limits;
-        const auto number = [serve](const char* option, std::size_t& value, const char* text) {
-            serve->add_option(option, value, text)->type_name("N")->group(limitGroup);
-        };
-        const auto seconds = [serve](const char* option, std::chrono::seconds& value,
-                                     const char* text) {
-            serve
-                ->add_option_function<std::uint32_t>(
-                    option,
-                    [&value](const std::uint32_t& given) { value = std::chrono::seconds(given); },
-                    text)
-                ->type_name("SECONDS")
-                ->group(limitGroup);
-        };
-        number("--max-header-line", limits.headerLine, "Bytes of one header (8192)");
-        number("--max-headers", limits.headers, "Bytes of all headers (16384)");
-        number("--max-body", limits.body, "Bytes of a request (1048576)");
-        number("--max-depth", limits.depth, "Depth of a request's XML (64)");
-        number("--max-connections", limits.connections, "Open connections (512)");
-        number("--max-waiting", limits.waiting, "Requests that wait for a worker (256)");
-        number("--max-enumerations", limits.sessions.sessions, "Open enumerations (64)");
-        number("--max-result", limits.result, "Bytes of a result (1073741824)");
-        number("--workers", limits.workers, "Operations at the same time (4)");
-        number("--max-stuck", limits.stuck,
-               "Further workers, for those whose operation does not return (16)");
-        number("--io-threads", limits.ioThreads, "Threads that read and send (2)");
-        seconds("--request-timeout", limits.request,
-                "For a request to arrive, and again for its operation (30)");
-        seconds("--answer-timeout", limits.answer, "For a client to take its answer (300)");
-        seconds("--enumeration-timeout", limits.sessions.defaultTimeout,
-                "Silence after which an open enumeration is forgotten (60)");
-        seconds("--max-enumeration-timeout", limits.sessions.longestTimeout,
-                "The longest such silence that a client may ask for (600)");
+        add->add_flag("--modify", records_.userAdd.mayModify, "The user may modify, not only read");
     }
 
     static void addPath(CLI::App* app, std::string& path) {
@@ -386,27 +362,21 @@ class Reader {
     }
 
     CommandLine line_;
-    ShowCommand show_;
-    RenameCommand rename_;
-    GraphCommand graph_;
-    TreeCommand tree_;
-    ClassesCommand classes_;
-    NamesCommand names_;
-    InstancesCommand instances_;
-    GetCommand get_;
-    ModifyCommand modify_;
-    AssociatorsCommand associators_;
-    ReferencesCommand references_;
-    ServeCommand serve_;
-    UserAddCommand userAdd_;
-    CheckCommand check_;
+    Records records_;
     CLI::App app_;
 };
 
-}  // namespace
+CommandLineReader::CommandLineReader() : parser_(std::make_unique<Parser>()) {}
+
+CommandLineReader::~CommandLineReader() = default;
+
+std::variant<CommandLine, Information> CommandLineReader::read(
+    const std::vector<std::string>& arguments) {
+    return parser_->read(arguments);
+}
 
 std::variant<CommandLine, Information> readCommandLine(const std::vector<std::string>& arguments) {
-    return Reader().read(arguments);
+    return CommandLineReader().read(arguments);
 }
 
 }  // namespace cimdhcp

@@ -114,15 +114,8 @@ Answer EmbeddedClient::references(const cimom::ObjectPath& path,
 }
 
 Failure EmbeddedClient::failure(const Answer& answer, const cimom::ObjectPath& asked) const {
-    // The object manager has no status of its own for a library that it cannot
-    // load; it begins such a message with the library's file.
-    const bool notLoaded = std::any_of(
-        registrations().begin(), registrations().end(),
-        [&answer](const cimom::Registration& registration) {
-            return answer.status.message.find("lib" + registration.location + ".so: ") !=
-                   std::string::npos;
-        });
-    return {notLoaded ? ExitStatus::notLoaded : ExitStatus::notDone, statusMessage(answer, asked)};
+    return {answer.status.noProvider ? ExitStatus::notLoaded : ExitStatus::notDone,
+            statusMessage(answer, asked)};
 }
 
 }  // namespace cimdhcp

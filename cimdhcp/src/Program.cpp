@@ -75,7 +75,7 @@ class Execution {
 
     void operator()(const CheckCommand& /*command*/) const {
         const auto findings = check(line_.options, installations(executableFile()));
-        outputs_.out << (presentation_.json() ? checkJson(findings) : checkText(findings));
+        outputs_.out << (presentation_.json() ? findingsJson(findings) : findingsText(findings));
         if (!isGood(findings)) {
             throw Failure(ExitStatus::notDone, "something is wrong, as the list tells");
         }

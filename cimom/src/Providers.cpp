@@ -101,10 +101,11 @@ Record* Provider::record(std::atomic<Record*>& slot, const char* kind, const std
         const CMPIBroker* const broker = loaded.broker->record();
         const Creating creating(creating_);
         auto* const made = create<Record>(library, broker, name_, kind, nameSpace, status);
+        status.noProvider = made == nullptr;
         slot.store(made, std::memory_order_release);
         return made;
     } catch (const LoadError& error) {
-        status = {CMPI_RC_ERR_FAILED, error.what()};
+        status = {CMPI_RC_ERR_FAILED, error.what(), true};
         return nullptr;
     }
 }

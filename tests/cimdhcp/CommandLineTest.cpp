@@ -134,6 +134,24 @@ TEST_F(CommandLineText, ReadsTheCommandsOfTheServer) {
     EXPECT_EQ(line({"check"}).command, Command(CheckCommand()));
 }
 
+TEST_F(CommandLineText, OneLineLeavesNothingToTheNext) {
+    CommandLineReader reader;
+    const auto read = [&reader](const std::vector<std::string>& arguments) {
+        return std::get<CommandLine>(reader.read(arguments));
+    };
+    EXPECT_EQ(read({"--connect", "a", "--no-header", "rename", "e", "n"}).options.connect,
+              std::vector<std::string>{"a"});
+    EXPECT_EQ(read({"rename", "eth0", "office"}), line({"rename", "eth0", "office"}));
+    EXPECT_EQ(read({"serve", "--max-body", "5"}), line({"serve", "--max-body", "5"}));
+    EXPECT_EQ(read({"serve"}), line({"serve"}));
+    EXPECT_THROW(static_cast<void>(reader.read({"--data-dir", "d", "--count", "modify", "P"})),
+                 Failure);
+    EXPECT_EQ(std::get<Information>(reader.read({"names", "--help"})).text,
+              information({"names", "--help"}));
+    EXPECT_EQ(read({"modify", "P", "a=1", "b=2"}), line({"modify", "P", "a=1", "b=2"}));
+    EXPECT_EQ(read({"show"}), line({"show"}));
+}
+
 TEST_F(CommandLineText, ATreeMayBeExplained) {
     EXPECT_EQ(line({"tree"}).command, Command(TreeCommand{false}));
     EXPECT_EQ(line({"tree", "--explain"}).command, Command(TreeCommand{true}));

@@ -3,6 +3,7 @@
 #include <chrono>
 #include <cstddef>
 #include <cstdint>
+#include <memory>
 #include <optional>
 #include <string>
 #include <variant>
@@ -149,9 +150,27 @@ struct Information {
     bool operator==(const Information&) const = default;
 };
 
-/// Reads the arguments behind the program's name. The environment is looked at
-/// for CIMDHCP_SCHEMA_DIR, CIMDHCP_REGISTRATION_DIR and CIMDHCP_PROVIDER_DIR.
-/// Throws Failure with ExitStatus::usage.
+/// Reads command lines, one after the other; none leaves anything to the next.
+/// One thread at a time.
+class CommandLineReader {
+  public:
+    CommandLineReader();
+    ~CommandLineReader();
+    CommandLineReader(const CommandLineReader&) = delete;
+    CommandLineReader& operator=(const CommandLineReader&) = delete;
+
+    /// Reads the arguments behind the program's name. The environment is looked at
+    /// for CIMDHCP_SCHEMA_DIR, CIMDHCP_REGISTRATION_DIR and CIMDHCP_PROVIDER_DIR.
+    /// Throws Failure with ExitStatus::usage.
+    [[nodiscard]] std::variant<CommandLine, Information> read(
+        const std::vector<std::string>& arguments);
+
+  private:
+    class Parser;
+    std::unique_ptr<Parser> parser_;
+};
+
+/// The same with a reader of its own.
 [[nodiscard]] std::variant<CommandLine, Information> readCommandLine(
     const std::vector<std::string>& arguments);
 

@@ -108,6 +108,8 @@ struct Instance {
 struct Status {
     CMPIrc code = CMPI_RC_OK;
     std::string message;
+    /// The provider could not be had: its library cannot be loaded, or its factory gave none.
+    bool noProvider = false;
 
     [[nodiscard]] bool ok() const noexcept { return code == CMPI_RC_OK; }
     bool operator==(const Status&) const = default;
