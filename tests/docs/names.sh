@@ -1,6 +1,7 @@
 #!/usr/bin/env bash
 # Every file that a page names, and every link to another page, is there. Of the pages
-# that say how the tree is changed, every name of the code is, too.
+# that say how the tree is changed, every name of the code is, too. And every folder is
+# told of in docs/architecture.md.
 # Usage: names.sh SOURCE_DIRECTORY
 set -euo pipefail
 cd "$1"
@@ -46,5 +47,16 @@ for page in docs/extending.md; do
         grep -rqwF --exclude-dir=docs --exclude-dir=build --exclude-dir=.git -- "${name##*::}" . ||
             missing "$page" "$name"
     done < <(grep -oP '`\K[A-Za-z_][A-Za-z0-9_:]*(?=(\(\))?`)' "$page")
+done
+
+for folder in */ platform/*/ cimom/wbem/; do
+    [[ $folder == build/ || $folder == platform/ ]] || grep -qF "\`$folder\`" docs/architecture.md ||
+        missing docs/architecture.md "$folder"
+done
+for folder in tests/*/; do
+    folder=${folder#tests/}
+    # The folder of a room's tests has the room's name.
+    [[ -d $folder && $folder != fuzz/ && $folder != docs/ ]] ||
+        grep -qF "\`$folder\`" docs/architecture.md || missing docs/architecture.md "tests/$folder"
 done
 exit $((failures > 0))
