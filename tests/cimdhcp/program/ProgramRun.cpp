@@ -114,6 +114,18 @@ ProgramTest::ProgramTest() {
     setTree(twoInterfaces);
 }
 
+std::string ProgramTest::usersFile() const {
+    const std::string file = directory() / "users";
+    for (const auto& [name, flag] : {std::pair{"ada", " --modify"}, std::pair{"bob", ""}}) {
+        EXPECT_EQ(
+            runAs("/bin/sh", {"-c", std::string("printf 'pass-") + name + "\\n' | " + program() +
+                                        " user add --users " + file + flag + " " + name})
+                .status,
+            0);
+    }
+    return file;
+}
+
 void ProgramTest::setTree(const std::string& nodes) const {
     ZR::Testing::writeFile(tree(), "{\"nodes\": [" + nodes + "]}");
 }

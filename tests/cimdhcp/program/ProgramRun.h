@@ -41,6 +41,9 @@ class ProgramTest : public ::testing::Test {
     Ended runOnTerminal(unsigned short columns, std::vector<std::string> arguments,
                         const Environment& extra = {}) const;
 
+    /// Makes a users file with ada, who may modify, and bob; "pass-" and the name is the password.
+    std::string usersFile() const;
+
     void setTree(const std::string& nodes) const;
     void writeConfiguration(const std::string& interface, const std::string& content) const {
         ZR::Testing::writeFile(configuration(interface), content);

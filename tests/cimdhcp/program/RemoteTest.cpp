@@ -67,18 +67,6 @@ class Remote : public test::ProgramTest {
         return classes;
     }
 
-    std::string usersFile() const {
-        const std::string file = directory() / "users";
-        for (const auto& [name, flag] : {std::pair{"ada", " --modify"}, std::pair{"bob", ""}}) {
-            EXPECT_EQ(runAs("/bin/sh",
-                            {"-c", std::string("printf 'pass-") + name + "\\n' | " + program() +
-                                       " user add --users " + file + flag + " " + name})
-                          .status,
-                      0);
-        }
-        return file;
-    }
-
     std::string credentials(const std::string& text) const {
         const std::string file = directory() / "credentials";
         ZR::Testing::writeFile(file, text);

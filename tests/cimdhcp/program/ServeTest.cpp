@@ -58,18 +58,6 @@ class Serve : public test::ProgramTest {
 
     [[nodiscard]] std::string log() const { return ZR::Testing::readFile(directory() / "log"); }
 
-    std::string usersFile() const {
-        const std::string file = directory() / "users";
-        for (const auto& [name, flag] : {std::pair{"ada", " --modify"}, std::pair{"bob", ""}}) {
-            EXPECT_EQ(runAs("/bin/sh",
-                            {"-c", std::string("printf 'pass-") + name + "\\n' | " + program() +
-                                       " user add --users " + file + flag + " " + name})
-                          .status,
-                      0);
-        }
-        return file;
-    }
-
     std::string certificate() const {
         const Ended made = runAs(
             "/usr/bin/openssl",
