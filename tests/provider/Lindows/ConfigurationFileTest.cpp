@@ -10,6 +10,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <array>
 #include <cerrno>
 #include <csignal>
 #include <cstdlib>
@@ -433,10 +434,19 @@ TEST_F(ConfigurationFile, FullDiskKeepsTheContentAndTellsOnce) {
         const std::string page(4096, 'x');
         while (::write(filler, page.data(), page.size()) > 0) {
         }
+        // Not even written and restored: the time of the last change stays.
+        constexpr std::array<timespec, 2> longAgo{{{1, 0}, {1, 0}}};
+        if (::utimensat(AT_FDCWD, path_.c_str(), longAgo.data(), 0) != 0) {
+            throw std::runtime_error("cannot set the time");
+        }
         const Identity before = identityOf(path_);
         const LogCapture capture(6000, 6000);
         modifyValue(path_, "CONFIG_NAME", std::string(8192, 'v'));
         std::string report = readFile(path_) == content ? "kept" : "changed";
+        struct stat status {};
+        if (::stat(path_.c_str(), &status) != 0 || status.st_mtim.tv_sec != longAgo[1].tv_sec) {
+            report += ", but touched";
+        }
         report += identityOf(path_) == before ? ", the same file" : ", another file";
         for (const auto& record : capture.log()) {
             report += "\n" + std::to_string(record.level) + " " + record.message;
@@ -450,6 +460,30 @@ TEST_F(ConfigurationFile, FullDiskKeepsTheContentAndTellsOnce) {
     EXPECT_THAT(child.output,
                 MatchesRegex("kept, the same file\n6000 MESSAGE \\[File: [^\n]*\\]: [^\n]*/"
                              "ifcfg-eth0: No space left on device\nCONFIG_NAME=new\n"));
+}
+
+/// ramfs knows of no room to take.
+TEST_F(ConfigurationFile, IsWrittenWhereTheFileSystemCannotPromiseRoom) {
+    if (!ZR::Testing::canEnterNamespaces()) {
+        GTEST_SKIP() << "needs a mount name space of its own";
+    }
+    const ChildResult child = inChild([&] {
+        enterMountNamespace();
+        if (::mount("ramfs", directory_.path().c_str(), "ramfs", 0, nullptr) != 0) {
+            return std::string("no ramfs for this user");
+        }
+        writeFile(path_, "CONFIG_NAME=old\nLAST=1\n");
+        const int fd = ::open(path_.c_str(), O_RDWR);
+        std::string report =
+            ::fallocate(fd, FALLOC_FL_KEEP_SIZE, 0, 1) == 0 ? "room: " : "no room: ";
+        ::close(fd);
+        modifyValue(path_, "CONFIG_NAME", "new");
+        return report + readFile(path_);
+    });
+    if (child.output == "no ramfs for this user") {
+        GTEST_SKIP() << child.output;
+    }
+    EXPECT_EQ(child.output, "no room: CONFIG_NAME=new\nLAST=1\n");
 }
 
 /// The limit on file sizes lets room be taken, but stops the write half-way.

@@ -228,4 +228,9 @@ TEST_F(DHCPCapabilitiesTest, WalkCostsGrowWithTheInterfacesAlone) {
     });
 }
 
+TEST_F(DHCPCapabilitiesTest, WithoutAFilterStepsCompareNothing) {
+    setTree({host({dhcpInterface("eth0"), dhcpInterface("eth1")})});
+    test::expectStepsToCompareNothing<Capabilities>();
+}
+
 }  // namespace

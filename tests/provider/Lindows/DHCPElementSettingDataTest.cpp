@@ -17,6 +17,7 @@ using test::dhcpInterface;
 using test::fails;
 using test::host;
 using test::staticInterface;
+using ::testing::Contains;
 using ::testing::ElementsAre;
 using ::testing::Pair;
 using ZR::DHCPClientProvider::DHCPElementSettingData;
@@ -33,6 +34,15 @@ TEST_F(DHCPElementSettingDataTest, EndpointAndSettingLeadToEachOther) {
     EXPECT_THAT(build(toElement, {{"InstanceID", "Computer%eth0"}}),
                 ElementsAre(Pair("SystemCreationClassName", "QVXZR_ComputerSystem"),
                             Pair("SystemName", hostName()), Pair("Name", "eth0")));
+}
+
+TEST_F(DHCPElementSettingDataTest, OnlyAPercentSignSplitsAnInstanceID) {
+    // All that the kernel takes in a name but the sign itself.
+    const std::string odd = "a~b.c_d-e,f;g#1";
+    setTree({host({dhcpInterface(odd)})});
+    EXPECT_THAT(build(toSetting, {{"Name", odd}}),
+                ElementsAre(Pair("InstanceID", "Computer%" + odd)));
+    EXPECT_THAT(build(toElement, {{"InstanceID", "Computer%" + odd}}), Contains(Pair("Name", odd)));
 }
 
 TEST_F(DHCPElementSettingDataTest, SettingDataFailuresKeepTheirTexts) {

@@ -36,6 +36,15 @@ TEST_F(DHCPOrderedComponentTest, SettingAndAssignmentLeadToEachOther) {
                 ElementsAre(Pair("InstanceID", "Computer%eth0")));
 }
 
+TEST_F(DHCPOrderedComponentTest, OnlyAPercentSignSplitsAnInstanceID) {
+    const std::string odd = "a~b.c_d-e,f;g#1";
+    setTree({host({dhcpInterface(odd)})});
+    EXPECT_THAT(build(toGroup, {{"InstanceID", "Computer%" + odd}}),
+                ElementsAre(Pair("InstanceID", "Computer%" + odd + "%dhcp")));
+    EXPECT_THAT(build(toPart, {{"InstanceID", "Computer%" + odd + "%dhcp"}}),
+                ElementsAre(Pair("InstanceID", "Computer%" + odd)));
+}
+
 TEST_F(DHCPOrderedComponentTest, AssignmentMustEndInExactlyDhcp) {
     setTree({host({staticInterface("eth0")})});
     for (const char* id : {"Computer%eth0%static", "Computer%eth0%DHCP", "Computer%eth0", "x"}) {

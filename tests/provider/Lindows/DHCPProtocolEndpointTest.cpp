@@ -400,7 +400,7 @@ TEST_F(DHCPProtocolEndpointTest, SystemGettersTraceTheDescriptionThatDecides) {
 }
 
 TEST_F(DHCPProtocolEndpointTest, EveryOperationTracesItsEntryAndItsExit) {
-    setTree({host({dhcpInterface("eth0")})});
+    setTree({host({dhcpInterface("eth0"), dhcpInterface("eth1")})});
     const LogCapture capture;
     {
         Endpoint endpoint;
@@ -446,6 +446,11 @@ TEST_F(DHCPProtocolEndpointTest, WalkCostsGrowWithTheInterfacesAlone) {
         endpoint.setFilter(Endpoint::FilterByName, "eth" + std::to_string(interfaces - 1));
         EXPECT_EQ(walk(endpoint).size(), 1U);
     });
+}
+
+TEST_F(DHCPProtocolEndpointTest, WithoutAFilterStepsCompareNothing) {
+    setTree({host({dhcpInterface("eth0"), dhcpInterface("eth1")})});
+    test::expectStepsToCompareNothing<Endpoint>();
 }
 
 }  // namespace

@@ -384,4 +384,9 @@ TEST_F(DHCPRemoteServiceAccessPointTest, WalkCostsGrowWithTheInterfacesAlone) {
     });
 }
 
+TEST_F(DHCPRemoteServiceAccessPointTest, WithoutAFilterStepsCompareNothing) {
+    setTree({host({dhcpInterface("eth0", {"192.0.2.1", "192.0.2.2"})})});
+    test::expectStepsToCompareNothing<AccessPoint>();
+}
+
 }  // namespace

@@ -366,4 +366,9 @@ TEST_F(DHCPSettingDataTest, WalkCostsGrowWithTheInterfacesAlone) {
     });
 }
 
+TEST_F(DHCPSettingDataTest, WithoutAFilterStepsCompareNothing) {
+    setTree({host({dhcpInterface("eth0"), dhcpInterface("eth1")})});
+    test::expectStepsToCompareNothing<Setting>();
+}
+
 }  // namespace

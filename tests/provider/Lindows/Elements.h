@@ -56,6 +56,18 @@ std::vector<std::string> walk(Element& element, bool (Element::*getter)(std::str
     return texts;
 }
 
+/// Without a filter, a step compares nothing.
+template <typename Element>
+void expectStepsToCompareNothing() {
+    Element element;
+    const LogCapture capture;
+    ++element;
+    ASSERT_TRUE(static_cast<bool>(element));
+    for (const LogRecord& record : capture.log()) {
+        EXPECT_EQ(record.message.find("evaluate()"), std::string::npos) << record.message;
+    }
+}
+
 /// An interface node whose name cannot be read.
 inline Json namelessInterface(Json properties = Json::object()) {
     return {{"type", "NetworkInterface"},

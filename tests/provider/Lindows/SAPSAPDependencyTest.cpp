@@ -8,6 +8,7 @@
 #include <vector>
 
 #include "Lindows/Builders.h"
+#include "Lindows/Elements.h"
 #include "Tree.h"
 
 namespace {
@@ -17,6 +18,7 @@ using test::dhcpInterface;
 using test::fails;
 using test::host;
 using test::Keys;
+using test::LogCapture;
 using test::serviceProcessor;
 using test::staticInterface;
 using ::testing::ElementsAre;
@@ -67,7 +69,10 @@ TEST_F(SAPSAPDependencyTest, AddressOriginFollowsTheAddressSourceOfTheRecordsOwn
         EXPECT_TRUE(record.getAddressOrigin(value));
         EXPECT_EQ(value, 0) << "a record that stands on nothing";
         record.selectNode(ZR::NodeLexicon::NodeType::NetworkInterface);
+        const LogCapture capture;
         EXPECT_TRUE(record.getAddressOrigin(value));
+        EXPECT_THAT(test::variables(capture.log()),
+                    ElementsAre("IPOrigin in IP Protocol=" + std::to_string(addressSource)));
         EXPECT_EQ(value, origin) << addressSource;
     }
 }

@@ -81,6 +81,31 @@ TEST_P(AssociationCells, Associators) {
     expectAssociators(host_.associators(source_, GetParam().association), log);
 }
 
+TEST_P(AssociationCells, FarEndsGoByTheirClassAndByTheStandardOne) {
+    const Host::Answer all = host_.associatorNames(source_, GetParam().association);
+    if (all.paths.empty()) {
+        EXPECT_EQ(GetParam().associators, Texts{});
+        return;
+    }
+    ASSERT_TRUE(all.paths.front());
+    const std::string farClass = all.paths.front()->className;
+    // That of the same stem, where there is one.
+    std::string standard = "CIM" + farClass.substr(farClass.find('_'));
+    if (host_.repository().find(standard) == nullptr) {
+        standard = host_.repository().find(farClass)->superclass;
+    }
+    for (const std::string& wanted : {farClass, standard}) {
+        EXPECT_EQ(briefs(host_.associatorNames(source_, GetParam().association, wanted.c_str())),
+                  ofHost(GetParam().associators))
+            << wanted;
+    }
+    for (const std::string& wanted : {farClass + '~', standard + '~'}) {
+        EXPECT_EQ(briefs(host_.associatorNames(source_, GetParam().association, wanted.c_str())),
+                  Texts{})
+            << wanted;
+    }
+}
+
 TEST_P(AssociationCells, ReferenceNames) {
     const LogCapture log(6000, 6000);
     expectReferences(host_.referenceNames(source_, GetParam().association));
