@@ -123,9 +123,10 @@ bool DHCPProtocolEndpoint::getProtocolIFType(unsigned short& value) const {
 
 bool DHCPProtocolEndpoint::getRequestedState(unsigned short& value) const {
     const ParameterScope scope(ZR_HERE, " value=", &value);
+    // What cannot be read is not enabled.
     bool enabled = false;
-    const bool known = cursor_.getProperty(Properties::DHCPEnabled, enabled);
-    value = known && enabled ? stateEnabled : stateDisabled;
+    cursor_.getProperty(Properties::DHCPEnabled, enabled);
+    value = enabled ? stateEnabled : stateDisabled;
     return true;
 }
 
