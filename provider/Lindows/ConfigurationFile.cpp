@@ -94,7 +94,7 @@ bool replaceContent(int fd, const std::string& before, const std::string& after)
     // The old bytes have their room already. Should even this fail, the message
     // about the first failure is all that can be done.
     if (writeAll(fd, before)) {
-        static_cast<void>(::ftruncate(fd, static_cast<off_t>(before.size())) == 0);
+        [[maybe_unused]] const int done = ::ftruncate(fd, static_cast<off_t>(before.size()));
     }
     errno = reason;
     return false;
