@@ -16,6 +16,7 @@
 #include "Machine.h"
 #include "include/TracePoint.h"
 #include "providerutilities/ProviderUtilities.h"
+#include "support/LogCapture.h"
 
 namespace {
 
@@ -82,16 +83,29 @@ void floorOfInstances(benchmark::State& state) {
     state.SetItemsProcessed(result.objects);
 }
 
+void ask(test::Host& host, const char* className, const CMPIResult& result) {
+    host.request(cimom::broker::ResultCollector::Kind::instances, test::pathOf(className),
+                 [&](auto* context, auto* /*collector*/, auto* path) {
+                     return host.instanceTable().enumerateInstances(nullptr, context, &result, path,
+                                                                    nullptr);
+                 });
+}
+
+/// How many trace points an instance costs, those of its share of the request with it.
+double tracePointsEach(test::Host& host, const char* className) {
+    bench::CountingResult result;
+    const ZR::Testing::LogCapture capture;
+    ask(host, className, result.record);
+    return static_cast<double>(capture.log().size()) / static_cast<double>(result.objects);
+}
+
 void enumerate(benchmark::State& state, const char* className) {
     bench::setInterfaces(state.range(0));
     test::Host host;
+    state.counters["trace_points"] = tracePointsEach(host, className);
     bench::CountingResult result;
     for (auto _ : state) {
-        host.request(cimom::broker::ResultCollector::Kind::instances, test::pathOf(className),
-                     [&](auto* context, auto* /*collector*/, auto* path) {
-                         return host.instanceTable().enumerateInstances(
-                             nullptr, context, &result.record, path, nullptr);
-                     });
+        ask(host, className, result.record);
     }
     state.SetItemsProcessed(result.objects);
 }

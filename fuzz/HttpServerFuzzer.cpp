@@ -9,6 +9,7 @@
 
 #include <algorithm>
 #include <array>
+#include <cerrno>
 #include <charconv>
 #include <map>
 #include <optional>
@@ -50,13 +51,23 @@ ZR::UniqueFd connected() {
     return fd;
 }
 
+/// Whether something comes within the time. The fuzzer's own timer interrupts the
+/// waiting now and then, which is no silence.
+bool comes(int fd, int milliseconds) {
+    pollfd readable{fd, POLLIN, 0};
+    int ready = 0;
+    do {
+        ready = ::poll(&readable, 1, milliseconds);
+    } while (ready < 0 && errno == EINTR);
+    return ready == 1;
+}
+
 /// What the server sends until it ends the connection or is silent for the time.
 std::string received(int fd, int milliseconds) {
     std::string answers;
     std::array<char, 65536> piece{};
     for (;;) {
-        pollfd readable{fd, POLLIN, 0};
-        if (::poll(&readable, 1, milliseconds) != 1) {
+        if (!comes(fd, milliseconds)) {
             return answers;
         }
         const ssize_t size = ::recv(fd, piece.data(), piece.size(), 0);

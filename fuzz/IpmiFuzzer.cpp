@@ -99,7 +99,9 @@ void checkConversation(const std::uint8_t* data, std::size_t size) {
     auto now = ZR::Live::IpmiConversation::Time{};
     ZR::Live::IpmiConversation conversation(processor, lastId,
                                             ZR::Live::IpmiConversation::usualChannel, now);
-    constexpr int looks = 12;
+    // Eleven at which an answer is missed are more than a second; those at which the
+    // answers of one of the three rounds have come do not count.
+    constexpr int looks = 11 + 3;
     for (int i = 0; i < looks && conversation.state() == State::Underway; ++i) {
         const int before = processor.received;
         now += std::chrono::milliseconds(100);

@@ -1,5 +1,7 @@
 #include "cimdhcp/ServerUrl.h"
 
+#include <arpa/inet.h>
+
 #include <algorithm>
 #include <cerrno>
 #include <charconv>
@@ -47,19 +49,24 @@ bool takeScheme(std::string_view& rest, const std::string& text) {
     return false;
 }
 
-/// An IPv6 address with brackets around it, maybe with the zone of an interface.
+/// An IPv6 address, maybe with the zone of an interface behind a "%".
+bool isAddress6(const std::string& text) {
+    const std::size_t sign = text.find('%');
+    in6_addr address{};
+    if (::inet_pton(AF_INET6, text.substr(0, sign).c_str(), &address) != 1) {
+        return false;
+    }
+    if (sign == std::string::npos) {
+        return true;
+    }
+    const std::string_view zone = std::string_view(text).substr(sign + 1);
+    return !zone.empty() && std::all_of(zone.begin(), zone.end(), isHostCharacter);
+}
+
+/// An IPv6 address with brackets around it.
 std::string takeBracketed(std::string_view& rest, const std::string& text) {
     const std::size_t end = rest.find(']');
-    const std::string_view inside = rest.substr(1, end == std::string_view::npos ? end : end - 1);
-    const bool good = end != std::string_view::npos && inside.find(':') != std::string_view::npos &&
-                      std::all_of(inside.begin(), inside.end(), [](char c) {
-                          return isHostCharacter(c) || c == ':' || c == '%';
-                      });
-    if (!good) {
-        refuse(text, "there is no IPv6 address in the brackets");
-    }
-    rest.remove_prefix(end + 1);
-    std::string address(inside);
+    std::string address(rest.substr(1, end == std::string_view::npos ? end : end - 1));
     // A zone's sign is encoded in a URL (RFC 6874), and people write it as it is.
     constexpr std::string_view encoded = "%25";
     const std::size_t zone = address.find('%');
@@ -67,6 +74,10 @@ std::string takeBracketed(std::string_view& rest, const std::string& text) {
         address.compare(zone, encoded.size(), encoded) == 0) {
         address.replace(zone, encoded.size(), "%");
     }
+    if (end == std::string_view::npos || !isAddress6(address)) {
+        refuse(text, "there is no IPv6 address in the brackets");
+    }
+    rest.remove_prefix(end + 1);
     return address;
 }
 

@@ -16,7 +16,7 @@ namespace cimom::broker {
 /// destroyed one by one, so only trivially destructible types may live there.
 ///
 /// A provider may go on using whatever it got until its request ends, also what it
-/// has long delivered. What an arena has beyond a megabyte or two is therefore backed
+/// has long delivered. What an arena has beyond some megabytes is therefore backed
 /// by a temporary file, and leaves the process' memory while nobody touches it.
 ///
 /// An arena of a request belongs to the thread that runs the request and takes

@@ -149,9 +149,7 @@ bool DHCPProtocolEndpoint::getEnabledState(unsigned short& value) const {
 bool DHCPProtocolEndpoint::getClientState(unsigned short& value) const {
     const ParameterScope scope(ZR_HERE, " value=", &value);
     unsigned short enabledState = 0;
-    if (!getEnabledState(enabledState)) {
-        return true;
-    }
+    getEnabledState(enabledState);
     if (enabledState == stateDisabled) {
         value = clientUnknown;
     } else if (enabledState == stateEnabledButOffline) {

@@ -49,6 +49,12 @@ TEST(ServerUrl, AddressesOfIPv6StandInBrackets) {
     EXPECT_EQ(read("[fe80::1%eth0]"), "https://[fe80::1%25eth0]:5989/cimom");
     EXPECT_EQ(readServerUrl("[fe80::1%25eth0]").host, "fe80::1%eth0") << "as a URL has it";
     EXPECT_EQ(readServerUrl("[fe80::1%25]").host, "fe80::1%25") << "the interface 25";
+    EXPECT_EQ(read("[fe80::1%2525]"), "https://[fe80::1%2525]:5989/cimom") << "the same";
+    EXPECT_EQ(read("[::ffff:192.0.2.1]"), "https://[::ffff:192.0.2.1]:5989/cimom");
+    for (const char* none : {"[a:b]", "[ff:5ee%]", "[fe80::1%]", "[fe80::1%e%1]", "[%eth0]", "[::1",
+                             "[]", "[192.0.2.1]", "[::1%eth 0]", "[1:2:3:4:5:6:7:8:9]"}) {
+        EXPECT_THAT(refusal(none), HasSubstr("there is no IPv6 address in the brackets")) << none;
+    }
     for (const char* text : {"[", "[]", "[host]", "[::1", "[::1]x", "::1", "[::1 ]"}) {
         EXPECT_THROW(static_cast<void>(readServerUrl(text)), Failure) << text;
     }

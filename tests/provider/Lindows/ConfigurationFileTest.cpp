@@ -486,9 +486,19 @@ TEST_F(ConfigurationFile, IsWrittenWhereTheFileSystemCannotPromiseRoom) {
     EXPECT_EQ(child.output, "no room: CONFIG_NAME=new\nLAST=1\n");
 }
 
-/// The limit on file sizes lets room be taken, but stops the write half-way.
-TEST_F(ConfigurationFile, WriteThatFailsHalfWayPutsTheOldContentBackAndTellsOnce) {
-    std::string content = "CONFIG_NAME=old\n";
+/// The limit on file sizes lets room be taken, but stops a write where it stands.
+struct StoppedWrite {
+    const char* name;
+    std::string before;  ///< the value
+    std::string after;
+    std::size_t stop;  ///< bytes that the file may have
+};
+
+class ConfigurationFileStopped : public ConfigurationFile,
+                                 public ::testing::WithParamInterface<StoppedWrite> {};
+
+TEST_P(ConfigurationFileStopped, WriteThatFailsHalfWayPutsTheOldContentBackAndTellsOnce) {
+    std::string content = "CONFIG_NAME=" + GetParam().before + "\n";
     while (content.size() < 8000) {
         content += "A" + std::to_string(content.size()) + "=1\n";
     }
@@ -498,13 +508,13 @@ TEST_F(ConfigurationFile, WriteThatFailsHalfWayPutsTheOldContentBackAndTellsOnce
         const LogCapture capture(6000, 6000);
         std::signal(SIGXFSZ, SIG_IGN);
         struct rlimit limit {};
-        limit.rlim_cur = content.size() + 10;
+        limit.rlim_cur = GetParam().stop;
         limit.rlim_max = RLIM_INFINITY;
         if (::setrlimit(RLIMIT_FSIZE, &limit) != 0) {
             throw std::runtime_error("no limit on file sizes");
         }
-        // All that follows the line moves by 47 bytes, so what was written is not the old text.
-        modifyValue(path_, "CONFIG_NAME", std::string(50, 'v'));
+        // All that follows the line moves, so what was written is not the old text.
+        modifyValue(path_, "CONFIG_NAME", GetParam().after);
         std::string report;
         for (const auto& record : capture.log()) {
             report += std::to_string(record.level) + " " + record.message + "\n";
@@ -517,6 +527,14 @@ TEST_F(ConfigurationFile, WriteThatFailsHalfWayPutsTheOldContentBackAndTellsOnce
     EXPECT_EQ(readFile(path_), content);
     EXPECT_EQ(identityOf(path_), before);
 }
+
+INSTANTIATE_TEST_SUITE_P(
+    Writes, ConfigurationFileStopped,
+    ::testing::Values(
+        StoppedWrite{"ThatGrows", "old", std::string(50, 'v'), 8020},
+        // Only the write fails here: making a file shorter is allowed beyond the limit.
+        StoppedWrite{"ThatShrinks", std::string(50, 'v'), "new", 4096}),
+    [](const auto& each) { return each.param.name; });
 
 /// The rewrite in the plainest form that there is: one byte after the other into a
 /// piece, which ends with a line feed or with its 511th byte.

@@ -23,7 +23,9 @@ using test::ofHost;
 using test::pathOf;
 using test::staticInterface;
 using test::Texts;
+using ::testing::Contains;
 using ::testing::ElementsAre;
+using ::testing::HasSubstr;
 using ::testing::IsEmpty;
 using ::testing::SizeIs;
 using ZR::Testing::LogCapture;
@@ -167,7 +169,10 @@ TEST_F(AssociationsTest, RolesChangeNothing) {
 }
 
 TEST_F(AssociationsTest, UnknownAssociationClassIsAnEmptySuccessForNamesAndInvalidForInstances) {
+    const LogCapture capture;
     const Host::Answer names = host_.associatorNames(endpoint("eth0"), "CIM_NoSuchClass");
+    EXPECT_THAT(capture.logMessages(),
+                Contains(HasSubstr("'CMPI_RC_ERR_INVALID_CLASS' has Value '5'")));
     EXPECT_EQ(names.code, CMPI_RC_OK);
     EXPECT_THAT(names.paths, IsEmpty());
     EXPECT_EQ(names.returnDoneCalls, 1U);
