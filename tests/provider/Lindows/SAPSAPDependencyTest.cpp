@@ -22,6 +22,7 @@ using test::LogCapture;
 using test::serviceProcessor;
 using test::staticInterface;
 using ::testing::ElementsAre;
+using ::testing::HasSubstr;
 using ::testing::Pair;
 using ZR::DHCPClientProvider::SAPSAPDependency;
 
@@ -73,6 +74,7 @@ TEST_F(SAPSAPDependencyTest, AddressOriginFollowsTheAddressSourceOfTheRecordsOwn
         EXPECT_TRUE(record.getAddressOrigin(value));
         EXPECT_THAT(test::variables(capture.log()),
                     ElementsAre("IPOrigin in IP Protocol=" + std::to_string(addressSource)));
+        EXPECT_THAT(capture.logMessages().front(), HasSubstr(" origin=0x"));
         EXPECT_EQ(value, origin) << addressSource;
     }
 }
