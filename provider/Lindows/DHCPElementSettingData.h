@@ -26,6 +26,9 @@ class DHCPElementSettingData : public Instrumentation {
 
     /// Always 1 (Is Current, CIM 2.41).
     bool getIsCurrent(unsigned short& isCurrent) const;
+
+  private:
+    [[maybe_unused]] unsigned short isCurrent_ = 0;  // set here and read by nobody
 };
 
 }  // namespace ZR::DHCPClientProvider
