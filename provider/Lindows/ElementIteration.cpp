@@ -37,8 +37,10 @@ bool readHostName(std::string& name, const TracePoint& at) {
 
 bool skipToDHCPInterface(Instrumentation& cursor) {
     for (; cursor; ++cursor) {
+        // What cannot be read is not enabled.
         bool enabled = false;
-        if (cursor.getProperty(NodeLexicon::Properties::DHCPEnabled, enabled) && enabled) {
+        cursor.getProperty(NodeLexicon::Properties::DHCPEnabled, enabled);
+        if (enabled) {
             return true;
         }
     }

@@ -390,7 +390,8 @@ TEST_F(ConfigurationFile, ValueThatIsNoLineIsRefusedWithAFailureLine) {
             EXPECT_EQ(records[0].file, "Lindows/ConfigurationFile");
             EXPECT_THAT(records[0].message,
                         MatchesRegex("MESSAGE \\[File: Lindows/ConfigurationFile, Line: "
-                                     "[0-9]+\\]: The value cannot be one line .*"));
+                                     "[0-9]+\\]: The value cannot be one line of the "
+                                     "configuration file"));
         }
     }
 }
