@@ -78,12 +78,12 @@ void addAddresses(const Json& link, std::vector<NetworkdAddress>& addresses) {
 }
 
 struct CloseBus {
-    void operator()(sd_bus* bus) const noexcept { SdBus::get().closeUnref(bus); }
+    void operator()(sd_bus* bus) const noexcept { SdBus::get()->closeUnref(bus); }
 };
 using Bus = std::unique_ptr<sd_bus, CloseBus>;
 
 struct UnrefMessage {
-    void operator()(sd_bus_message* message) const noexcept { SdBus::get().messageUnref(message); }
+    void operator()(sd_bus_message* message) const noexcept { SdBus::get()->messageUnref(message); }
 };
 using BusMessage = std::unique_ptr<sd_bus_message, UnrefMessage>;
 
@@ -93,11 +93,11 @@ class BusError {
     BusError() = default;
     BusError(const BusError&) = delete;
     BusError& operator=(const BusError&) = delete;
-    ~BusError() { SdBus::get().errorFree(&error_); }
+    ~BusError() { SdBus::get()->errorFree(&error_); }
 
     sd_bus_error* get() noexcept { return &error_; }
     [[nodiscard]] bool is(const char* name) const noexcept {
-        return SdBus::get().errorHasName(&error_, name) != 0;
+        return SdBus::get()->errorHasName(&error_, name) != 0;
     }
 
   private:
@@ -115,11 +115,11 @@ std::uint64_t left(Deadline deadline) {
 /// long as it takes. Answers an errno, 0 for none.
 int awaitReady(sd_bus* bus, Deadline deadline) {
     for (;;) {
-        const int ready = SdBus::get().isReady(bus);
+        const int ready = SdBus::get()->isReady(bus);
         if (ready != 0) {
             return ready < 0 ? -ready : 0;
         }
-        const int done = SdBus::get().process(bus, nullptr);
+        const int done = SdBus::get()->process(bus, nullptr);
         if (done < 0) {
             return -done;
         }
@@ -128,7 +128,7 @@ int awaitReady(sd_bus* bus, Deadline deadline) {
             if (time == 0) {
                 return ETIMEDOUT;
             }
-            if (const int waited = SdBus::get().wait(bus, time); waited < 0 && waited != -EINTR) {
+            if (const int waited = SdBus::get()->wait(bus, time); waited < 0 && waited != -EINTR) {
                 return -waited;
             }
         }
@@ -163,12 +163,12 @@ Parsed<std::vector<NetworkdAddress>> parseNetworkdDescription(std::string_view j
 }
 
 NetworkdAnswer askNetworkd(Deadline deadline) {
-    const SdBus& functions = SdBus::get();
-    if (!functions.missing().empty()) {
-        return failure(functions.missing());
+    const std::shared_ptr<const SdBus> functions = SdBus::get();
+    if (!functions->missing().empty()) {
+        return failure(functions->missing());
     }
     sd_bus* opened = nullptr;
-    const int open = functions.openSystem(&opened);
+    const int open = functions->openSystem(&opened);
     const Bus bus{opened};
     if (open < 0) {
         // Many a machine has networkd and no bus.
@@ -178,21 +178,22 @@ NetworkdAnswer askNetworkd(Deadline deadline) {
         return failure(error);
     }
     sd_bus_message* made = nullptr;
-    const int make = functions.newMethodCall(bus.get(), &made, service, "/org/freedesktop/network1",
-                                             "org.freedesktop.network1.Manager", "Describe");
+    const int make =
+        functions->newMethodCall(bus.get(), &made, service, "/org/freedesktop/network1",
+                                 "org.freedesktop.network1.Manager", "Describe");
     const BusMessage question{made};
     if (make < 0) {
         return failure(-make);
     }
-    if (const int set = functions.setAutoStart(question.get(), 0); set < 0) {
+    if (const int set = functions->setAutoStart(question.get(), 0); set < 0) {
         return failure(-set);
     }
     BusError error;
     sd_bus_message* answered = nullptr;
     // A timeout of 0 would mean the library's own of 25 seconds.
     const int call =
-        functions.call(bus.get(), question.get(), std::max<std::uint64_t>(left(deadline), 1),
-                       error.get(), &answered);
+        functions->call(bus.get(), question.get(), std::max<std::uint64_t>(left(deadline), 1),
+                        error.get(), &answered);
     const BusMessage answer{answered};
     if (call < 0) {
         const bool absent = error.is(SD_BUS_ERROR_SERVICE_UNKNOWN) ||
@@ -201,7 +202,7 @@ NetworkdAnswer askNetworkd(Deadline deadline) {
         return absent ? NetworkdAnswer{} : failure(-call);
     }
     const char* text = nullptr;
-    if (const int read = functions.readBasic(answer.get(), SD_BUS_TYPE_STRING, &text); read < 0) {
+    if (const int read = functions->readBasic(answer.get(), SD_BUS_TYPE_STRING, &text); read < 0) {
         return failure(-read);
     }
     return {.json = text, .reason = {}};

@@ -2,12 +2,19 @@
 
 #include <dlfcn.h>
 
+#include <mutex>
 #include <type_traits>
 
 namespace ZR::Live {
 
-const SdBus& SdBus::get() {
-    static const SdBus functions("libsystemd.so.0");
+std::shared_ptr<const SdBus> SdBus::get() {
+    static std::mutex mutex;
+    static std::shared_ptr<const SdBus> functions;
+    const std::lock_guard lock(mutex);
+    // What was in the way, a want of descriptors say, may be over.
+    if (!functions || !functions->missing().empty()) {
+        functions = std::make_shared<const SdBus>("libsystemd.so.0");
+    }
     return functions;
 }
 

@@ -2,6 +2,7 @@
 
 #include <systemd/sd-bus.h>
 
+#include <memory>
 #include <string>
 
 namespace ZR::Live {
@@ -12,9 +13,9 @@ namespace ZR::Live {
 /// most machines have nobody on the bus who is asked.
 class SdBus {
   public:
-    /// Those of this process, loaded by the first call and kept until this code itself is
-    /// unloaded. Any thread.
-    [[nodiscard]] static const SdBus& get();
+    /// Those of this process, kept until this code itself is unloaded. While they cannot
+    /// be had, each call tries again. Any thread.
+    [[nodiscard]] static std::shared_ptr<const SdBus> get();
 
     /// Those of a library, by the name that the loader finds it by.
     explicit SdBus(const char* library);
