@@ -23,12 +23,12 @@ SdBus::SdBus(const char* library) : handle_(::dlopen(library, RTLD_NOW | RTLD_LO
         const char* const reason = ::dlerror();
         missing_ = reason == nullptr ? "the library cannot be loaded" : reason;
     };
-    if (handle_ == nullptr) {
+    if (!handle_) {
         tellWhy();
         return;
     }
     const auto find = [&](auto& function, const char* name) {
-        void* const symbol = ::dlsym(handle_, name);
+        void* const symbol = ::dlsym(handle_.get(), name);
         if (symbol == nullptr && missing_.empty()) {
             tellWhy();
         }
@@ -48,10 +48,8 @@ SdBus::SdBus(const char* library) : handle_(::dlopen(library, RTLD_NOW | RTLD_LO
     find(errorFree, "sd_bus_error_free");
 }
 
-SdBus::~SdBus() {
-    if (handle_ != nullptr) {
-        ::dlclose(handle_);
-    }
+void SdBus::Close::operator()(void* handle) const noexcept {
+    ::dlclose(handle);
 }
 
 }  // namespace ZR::Live

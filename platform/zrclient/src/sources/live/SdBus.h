@@ -19,9 +19,6 @@ class SdBus {
 
     /// Those of a library, by the name that the loader finds it by.
     explicit SdBus(const char* library);
-    ~SdBus();
-    SdBus(const SdBus&) = delete;
-    SdBus& operator=(const SdBus&) = delete;
 
     /// Why the functions cannot be had; empty when they can. Only then may they be called.
     [[nodiscard]] const std::string& missing() const noexcept { return missing_; }
@@ -40,7 +37,10 @@ class SdBus {
     decltype(&::sd_bus_error_free) errorFree = nullptr;
 
   private:
-    void* handle_;
+    struct Close {
+        void operator()(void* handle) const noexcept;
+    };
+    std::unique_ptr<void, Close> handle_;
     std::string missing_;
 };
 
