@@ -14,13 +14,13 @@
 #include <string>
 #include <vector>
 
-#include "CMPI/Host.h"
+#include "BenchmarkMachine.h"
 #include "Lindows/DHCPElementSettingData.h"
 #include "Lindows/DHCPOrderedComponent.h"
 #include "Lindows/DHCPRemoteAccessAvailableToElement.h"
 #include "Lindows/ElementCapabilities.h"
 #include "Lindows/SAPSAPDependency.h"
-#include "Machine.h"
+#include "kit/Host.h"
 #include "zrclient/Moniker.h"
 #include "zrcommon/SystemName.h"
 

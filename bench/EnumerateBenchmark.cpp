@@ -12,11 +12,11 @@
 #include <string>
 #include <vector>
 
-#include "CMPI/Host.h"
-#include "Machine.h"
+#include "BenchmarkMachine.h"
 #include "include/TracePoint.h"
+#include "kit/Host.h"
+#include "kit/LogCapture.h"
 #include "providerutilities/ProviderUtilities.h"
-#include "support/LogCapture.h"
 
 namespace {
 

@@ -15,7 +15,7 @@
 #include <stdexcept>
 #include <string>
 
-#include "Machine.h"
+#include "BenchmarkMachine.h"
 #include "cimom/ObjectManager.h"
 
 namespace {

@@ -38,12 +38,12 @@
 #include <string_view>
 #include <vector>
 
-#include "Clients.h"
 #include "OwnMachine.h"
+#include "clients/Clients.h"
 #include "zrclient/Instrumentation.h"
 #include "zrclient/InstrumentationService.h"
-#include "zrclient/LiveSource.h"
 #include "zrcommon/UniqueFd.h"
+#include "zrlinux/LiveSource.h"
 
 namespace {
 

@@ -44,15 +44,19 @@ if(ZR_COVERAGE)
     add_link_options(-fprofile-instr-generate)
 endif()
 
-# zr_room(NAME SOURCES file... [LINKS target...] [PRIVATE_LINKS target...])
-# A static library whose public headers are under include/.
+# zr_room(NAME SOURCES file... [ROOT directory] [LINKS target...] [PRIVATE_LINKS target...])
+# A static library whose public headers are under include/, and whose own are named from
+# ROOT, which is src unless given.
 function(zr_room name)
-    cmake_parse_arguments(ROOM "" "" "SOURCES;LINKS;PRIVATE_LINKS" ${ARGN})
+    cmake_parse_arguments(ROOM "" "ROOT" "SOURCES;LINKS;PRIVATE_LINKS" ${ARGN})
+    if(NOT ROOM_ROOT)
+        set(ROOM_ROOT src)
+    endif()
     add_library(${name} STATIC ${ROOM_SOURCES})
     target_include_directories(${name}
         PUBLIC $<BUILD_INTERFACE:${CMAKE_CURRENT_SOURCE_DIR}/include>
                $<INSTALL_INTERFACE:${ZR_INSTALL_INCLUDEDIR}>
-        PRIVATE src)
+        PRIVATE ${ROOM_ROOT})
     target_link_libraries(${name} PUBLIC ${ROOM_LINKS}
                           PRIVATE $<BUILD_INTERFACE:zr_options> ${ROOM_PRIVATE_LINKS})
 endfunction()

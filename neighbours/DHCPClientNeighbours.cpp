@@ -10,6 +10,7 @@
 #include "NeighbourObjects.h"
 #include "providerutilities/ProviderUtilities.h"
 #include "tklogger/TKLogger.h"
+#include "zrlinux/LiveSource.h"
 
 /// The CMPI side of the neighbour provider: enumerate, enumerate names and get.
 namespace ZR::DHCPClientNeighbours {
@@ -219,5 +220,6 @@ CMPIInstanceMI* DHCPClientNeighbours_Create_InstanceMI(const CMPIBroker* broker,
                                                        CMPIStatus* /*rc*/) {
     static CMPIInstanceMI mi{nullptr, &ZR::DHCPClientNeighbours::functionTable};
     ZR::DHCPClientNeighbours::broker = broker;
+    ZR::serveLiveMachine();
     return &mi;
 }

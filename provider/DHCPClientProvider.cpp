@@ -19,6 +19,7 @@
 #include "include/TracePoint.h"
 #include "providerutilities/ProviderUtilities.h"
 #include "zrclient/OneMoment.h"
+#include "zrlinux/LiveSource.h"
 
 namespace ZR::DHCPClientProvider {
 
@@ -398,6 +399,7 @@ CMPIInstanceMI* DHCPClientProvider_Create_InstanceMI(const CMPIBroker* broker,
                                                      CMPIStatus* /*rc*/) {
     static CMPIInstanceMI mi{nullptr, &ZR::DHCPClientProvider::instMIFT__};
     ZR::DHCPClientProvider::broker = broker;
+    ZR::serveLiveMachine();
     return &mi;
 }
 
@@ -406,5 +408,6 @@ CMPIAssociationMI* DHCPClientProvider_Create_AssociationMI(const CMPIBroker* bro
                                                            CMPIStatus* /*rc*/) {
     static CMPIAssociationMI mi{nullptr, &ZR::DHCPClientProvider::assocMIFT__};
     ZR::DHCPClientProvider::broker = broker;
+    ZR::serveLiveMachine();
     return &mi;
 }

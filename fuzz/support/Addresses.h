@@ -9,8 +9,8 @@
 #include <string>
 #include <vector>
 
-#include "AddressText.h"
 #include "Input.h"
+#include "formats/AddressText.h"
 
 namespace fuzz {
 

@@ -49,8 +49,8 @@ for page in docs/extending.md; do
     done < <(grep -oP '`\K[A-Za-z_][A-Za-z0-9_:]*(?=(\(\))?`)' "$page")
 done
 
-for folder in */ platform/*/ cimom/wbem/; do
-    [[ $folder == build/ || $folder == platform/ ]] || grep -qF "\`$folder\`" docs/architecture.md ||
+for folder in */ platform/*/ wbem/*/; do
+    [[ $folder == build/ || $folder == platform/ || $folder == wbem/ ]] || grep -qF "\`$folder\`" docs/architecture.md ||
         missing docs/architecture.md "$folder"
 done
 for folder in tests/*/; do

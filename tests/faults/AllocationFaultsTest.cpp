@@ -3,9 +3,9 @@
 #include <gtest/gtest.h>
 
 #include "FaultSweep.h"
-#include "LiveMachine.h"
-#include "Namespaces.h"
-#include "TreeMachine.h"
+#include "NamespaceMachine.h"
+#include "kit/Namespaces.h"
+#include "kit/TreeMachine.h"
 
 namespace test {
 namespace {

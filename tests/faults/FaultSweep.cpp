@@ -10,9 +10,9 @@
 #include <filesystem>
 #include <vector>
 
-#include "support/Allocations.h"
-#include "support/Files.h"
-#include "support/SystemCalls.h"
+#include "kit/Allocations.h"
+#include "kit/Files.h"
+#include "kit/SystemCalls.h"
 
 namespace test {
 namespace {

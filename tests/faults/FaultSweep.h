@@ -5,11 +5,11 @@
 #include <functional>
 #include <string>
 
-#include "Machine.h"
-#include "ProviderHost.h"
-#include "Script.h"
-#include "support/CallOrigin.h"
-#include "support/TemporaryDirectory.h"
+#include "kit/CallOrigin.h"
+#include "kit/FaultMachine.h"
+#include "kit/ProviderHost.h"
+#include "kit/Script.h"
+#include "kit/TemporaryDirectory.h"
 
 namespace test {
 

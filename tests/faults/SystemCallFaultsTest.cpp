@@ -6,9 +6,9 @@
 #include <cstdio>
 
 #include "FaultSweep.h"
-#include "LiveMachine.h"
-#include "Namespaces.h"
-#include "TreeMachine.h"
+#include "NamespaceMachine.h"
+#include "kit/Namespaces.h"
+#include "kit/TreeMachine.h"
 
 namespace test {
 namespace {

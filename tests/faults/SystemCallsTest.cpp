@@ -9,12 +9,12 @@
 #include <set>
 #include <string>
 
-#include "LiveMachine.h"
-#include "Namespaces.h"
-#include "ProviderHost.h"
-#include "TreeMachine.h"
-#include "support/Allocations.h"
-#include "support/SystemCalls.h"
+#include "NamespaceMachine.h"
+#include "kit/Allocations.h"
+#include "kit/Namespaces.h"
+#include "kit/ProviderHost.h"
+#include "kit/SystemCalls.h"
+#include "kit/TreeMachine.h"
 
 namespace test {
 namespace {

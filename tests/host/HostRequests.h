@@ -3,8 +3,8 @@
 #include <string>
 #include <vector>
 
-#include "StrictHost.h"
 #include "cimom/ObjectManager.h"
+#include "kit/StrictHost.h"
 
 /// Requests that are put to the embedded object manager and to the strict host alike,
 /// and their answers as text, so that the two can be compared.

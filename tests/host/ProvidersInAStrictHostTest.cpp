@@ -11,10 +11,10 @@
 #include <thread>
 
 #include "HostRequests.h"
-#include "StrictHost.h"
-#include "Tree.h"
 #include "cimom/ObjectPathText.h"
-#include "support/TemporaryDirectory.h"
+#include "kit/StrictHost.h"
+#include "kit/TemporaryDirectory.h"
+#include "kit/Tree.h"
 
 namespace {
 

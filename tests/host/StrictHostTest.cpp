@@ -1,5 +1,5 @@
 // What the strict host notices, and what it forgives.
-#include "StrictHost.h"
+#include "kit/StrictHost.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>

@@ -9,18 +9,18 @@
 #include <string>
 #include <vector>
 
-#include "Broker.h"
-#include "BrokerContext.h"
-#include "BrokerResult.h"
-#include "CMPI/CountedBroker.h"
-#include "Conversion.h"
-#include "RequestScope.h"
-#include "Schema.h"
-#include "Tree.h"
+#include "broker/Broker.h"
+#include "broker/Conversion.h"
+#include "broker/RequestScope.h"
+#include "broker/objects/BrokerContext.h"
+#include "broker/objects/BrokerResult.h"
 #include "cimom/ClassRepository.h"
 #include "cimom/ObjectManager.h"
 #include "cimom/ObjectPathText.h"
-#include "support/LogCapture.h"
+#include "kit/CountedBroker.h"
+#include "kit/LogCapture.h"
+#include "kit/Tree.h"
+#include "mof/Schema.h"
 
 CMPI_EXTERN_C CMPIInstanceMI* DHCPClientNeighbours_Create_InstanceMI(const CMPIBroker* broker,
                                                                      const CMPIContext* ctx,

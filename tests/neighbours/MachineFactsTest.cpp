@@ -6,7 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "Tree.h"
+#include "kit/Tree.h"
 
 namespace ZR::DHCPClientNeighbours {
 

@@ -17,11 +17,11 @@
 #include <vector>
 
 #include "Growth.h"
-#include "ProviderHost.h"
-#include "Script.h"
-#include "TreeMachine.h"
-#include "support/Files.h"
-#include "support/PrivateNamespace.h"
+#include "kit/Files.h"
+#include "kit/PrivateNamespace.h"
+#include "kit/ProviderHost.h"
+#include "kit/Script.h"
+#include "kit/TreeMachine.h"
 
 namespace {
 

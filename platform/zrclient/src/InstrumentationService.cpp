@@ -4,19 +4,28 @@
 #include <utility>
 
 #include "sources/JsonTreeSource.h"
-#include "zrclient/LiveSource.h"
 #include "zrcommon/PlatformSettings.h"
 
 namespace ZR {
 
 namespace {
 
+std::atomic<InstrumentationService::OpenMachine> openMachine = nullptr;
+
+/// What a process sees that was never told how its machine is opened.
+class NoMachine : public SnapshotSource {
+  public:
+    bool changed() override { return false; }
+    std::shared_ptr<const Snapshot> read() override { return SnapshotBuilder().build(); }
+};
+
 std::unique_ptr<SnapshotSource> openSourceOfSettings() {
     const std::string& tree = PlatformSettings::process().instrumentationTree;
     if (!tree.empty()) {
         return std::make_unique<JsonTreeSource>(tree);
     }
-    return openLiveSource();
+    const auto open = openMachine.load();
+    return open == nullptr ? std::make_unique<NoMachine>() : open();
 }
 
 }  // namespace
@@ -25,6 +34,10 @@ InstrumentationService& InstrumentationService::process() {
     // Destroyed when the library is unloaded, and its descriptors with it.
     static InstrumentationService service;
     return service;
+}
+
+void InstrumentationService::setMachine(OpenMachine open) noexcept {
+    openMachine = open;
 }
 
 InstrumentationService::InstrumentationService(std::unique_ptr<SnapshotSource> source)

@@ -4,7 +4,7 @@
 #include <filesystem>
 #include <regex>
 
-#include "support/Files.h"
+#include "kit/Files.h"
 
 namespace test {
 

@@ -7,8 +7,8 @@
 #include <utility>
 #include <vector>
 
-#include "support/Files.h"
-#include "support/TemporaryDirectory.h"
+#include "kit/Files.h"
+#include "kit/TemporaryDirectory.h"
 
 namespace test {
 

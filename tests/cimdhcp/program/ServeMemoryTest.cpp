@@ -10,7 +10,7 @@
 
 #include "ProgramRun.h"
 #include "ServedProgram.h"
-#include "support/Sanitizers.h"
+#include "kit/Sanitizers.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace {

@@ -8,7 +8,7 @@
 #include "ExpectedMachine.h"
 #include "ProgramRun.h"
 #include "ServedProgram.h"
-#include "support/Sanitizers.h"
+#include "kit/Sanitizers.h"
 
 namespace {
 

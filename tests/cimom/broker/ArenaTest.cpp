@@ -1,4 +1,4 @@
-#include "Arena.h"
+#include "broker/Arena.h"
 
 #include <gtest/gtest.h>
 #include <unistd.h>
@@ -9,7 +9,7 @@
 #include <fstream>
 #include <vector>
 
-#include "support/Sanitizers.h"
+#include "kit/Sanitizers.h"
 
 using cimom::broker::Arena;
 

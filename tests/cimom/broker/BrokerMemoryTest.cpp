@@ -1,8 +1,8 @@
-#include "BrokerMemory.h"
+#include "broker/BrokerMemory.h"
 
 #include <cstring>
 
-#include "TestBroker.h"
+#include "kit/BrokerFixture.h"
 
 namespace cimom::test {
 namespace {

@@ -1,9 +1,9 @@
-#include "Broker.h"
+#include "broker/Broker.h"
 
 #include <thread>
 
-#include "BrokerContext.h"
-#include "TestBroker.h"
+#include "broker/objects/BrokerContext.h"
+#include "kit/BrokerFixture.h"
 
 namespace cimom::test {
 namespace {

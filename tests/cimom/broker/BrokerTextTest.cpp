@@ -1,7 +1,7 @@
-#include "BrokerText.h"
+#include "broker/BrokerText.h"
 
-#include "BrokerArgs.h"
-#include "TestBroker.h"
+#include "broker/objects/BrokerArgs.h"
+#include "kit/BrokerFixture.h"
 
 namespace cimom::test {
 namespace {

@@ -1,6 +1,6 @@
 #include <map>
 
-#include "TestManager.h"
+#include "kit/TestManager.h"
 
 namespace cimom::test {
 namespace {

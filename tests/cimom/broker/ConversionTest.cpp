@@ -1,8 +1,8 @@
-#include "Conversion.h"
+#include "broker/Conversion.h"
 
 #include <limits>
 
-#include "TestBroker.h"
+#include "kit/BrokerFixture.h"
 
 namespace cimom::test {
 namespace {

@@ -1,4 +1,4 @@
-#include "RequestScope.h"
+#include "broker/RequestScope.h"
 
 #include <gtest/gtest.h>
 

@@ -7,10 +7,10 @@
 #include <map>
 #include <string>
 
-#include "TestBroker.h"
+#include "ProviderUtilitiesFixture.h"
+#include "kit/ChildProcess.h"
+#include "kit/TemporaryDirectory.h"
 #include "providerutilities/ProviderUtilities.h"
-#include "support/ChildProcess.h"
-#include "support/TemporaryDirectory.h"
 
 namespace ZR {
 

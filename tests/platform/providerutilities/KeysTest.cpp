@@ -3,7 +3,7 @@
 #include <string>
 #include <thread>
 
-#include "TestBroker.h"
+#include "ProviderUtilitiesFixture.h"
 #include "providerutilities/ProviderUtilities.h"
 
 namespace ZR {

@@ -2,7 +2,7 @@
 
 #include <string>
 
-#include "TestBroker.h"
+#include "ProviderUtilitiesFixture.h"
 #include "providerutilities/ProviderUtilities.h"
 
 namespace ZR {

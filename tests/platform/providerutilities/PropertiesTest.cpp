@@ -3,7 +3,7 @@
 #include <string>
 #include <vector>
 
-#include "TestBroker.h"
+#include "ProviderUtilitiesFixture.h"
 #include "providerutilities/ProviderUtilities.h"
 
 namespace ZR {

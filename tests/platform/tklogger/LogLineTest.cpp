@@ -7,7 +7,7 @@
 #include <ctime>
 #include <string>
 
-#include "support/ChildProcess.h"
+#include "kit/ChildProcess.h"
 
 namespace TKLog {
 

@@ -10,10 +10,10 @@
 #include <string>
 #include <vector>
 
-#include "support/ChildProcess.h"
-#include "support/Files.h"
-#include "support/LogCapture.h"
-#include "support/TemporaryDirectory.h"
+#include "kit/ChildProcess.h"
+#include "kit/Files.h"
+#include "kit/LogCapture.h"
+#include "kit/TemporaryDirectory.h"
 
 namespace TKLog {
 

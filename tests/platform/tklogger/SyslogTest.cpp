@@ -11,8 +11,8 @@
 #include <string>
 
 #include "LogSink.h"
-#include "support/ChildProcess.h"
-#include "support/PrivateNamespace.h"
+#include "kit/ChildProcess.h"
+#include "kit/PrivateNamespace.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace TKLog {

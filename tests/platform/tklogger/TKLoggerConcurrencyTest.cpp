@@ -6,9 +6,9 @@
 #include <thread>
 #include <vector>
 
-#include "support/Files.h"
-#include "support/LogCapture.h"
-#include "support/TemporaryDirectory.h"
+#include "kit/Files.h"
+#include "kit/LogCapture.h"
+#include "kit/TemporaryDirectory.h"
 #include "tklogger/TKLogger.h"
 
 namespace TKLog {

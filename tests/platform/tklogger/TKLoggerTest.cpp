@@ -8,7 +8,7 @@
 
 #include "AllocationCount.h"
 #include "SlowPathCount.h"
-#include "support/LogCapture.h"
+#include "kit/LogCapture.h"
 
 namespace TKLog {
 

@@ -2,7 +2,7 @@
 
 #include <array>
 
-#include "Support.h"
+#include "kit/ZrclientSupport.h"
 
 namespace ZR::Testing {
 namespace {

@@ -4,7 +4,7 @@
 #include <latch>
 #include <thread>
 
-#include "Support.h"
+#include "kit/ZrclientSupport.h"
 #include "sources/JsonTreeSource.h"
 #include "zrclient/Instrumentation.h"
 

@@ -2,7 +2,7 @@
 
 #include <gmock/gmock.h>
 
-#include "Support.h"
+#include "kit/ZrclientSupport.h"
 
 namespace ZR::Testing {
 namespace {

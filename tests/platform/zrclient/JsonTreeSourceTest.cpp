@@ -5,7 +5,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include "Support.h"
+#include "kit/ZrclientSupport.h"
 #include "zrclient/Instrumentation.h"
 #include "zrcommon/SystemName.h"
 

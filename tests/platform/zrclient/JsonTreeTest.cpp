@@ -5,7 +5,7 @@
 #include <cstdint>
 #include <random>
 
-#include "Support.h"
+#include "kit/ZrclientSupport.h"
 
 namespace ZR::Testing {
 namespace {

@@ -4,7 +4,7 @@
 
 #include <thread>
 
-#include "Support.h"
+#include "kit/ZrclientSupport.h"
 #include "zrclient/Instrumentation.h"
 #include "zrclient/InstrumentationService.h"
 

@@ -13,7 +13,7 @@
 #include <optional>
 #include <string_view>
 
-#include "Support.h"
+#include "kit/ZrclientSupport.h"
 #include "sources/JsonTreeSource.h"
 #include "zrclient/Instrumentation.h"
 

@@ -1,6 +1,6 @@
 #include "zrclient/SnapshotJson.h"
 
-#include "Support.h"
+#include "kit/ZrclientSupport.h"
 #include "sources/JsonTreeSource.h"
 
 namespace ZR::Testing {

@@ -12,9 +12,9 @@
 #include <cstring>
 #include <string>
 
-#include "support/ChildProcess.h"
-#include "support/Files.h"
-#include "support/TemporaryDirectory.h"
+#include "kit/ChildProcess.h"
+#include "kit/Files.h"
+#include "kit/TemporaryDirectory.h"
 #include "zrcommon/Strings.h"
 #include "zrcommon/UniqueFd.h"
 

@@ -10,10 +10,10 @@
 #include <string>
 #include <vector>
 
-#include "support/ChildProcess.h"
-#include "support/Files.h"
-#include "support/PrivateNamespace.h"
-#include "support/TemporaryDirectory.h"
+#include "kit/ChildProcess.h"
+#include "kit/Files.h"
+#include "kit/PrivateNamespace.h"
+#include "kit/TemporaryDirectory.h"
 #include "zrcommon/PlatformUtilities.h"
 
 namespace ZR {

@@ -5,8 +5,8 @@
 #include <string>
 #include <vector>
 
-#include "support/Files.h"
-#include "support/TemporaryDirectory.h"
+#include "kit/Files.h"
+#include "kit/TemporaryDirectory.h"
 
 namespace ZR {
 

@@ -6,8 +6,8 @@
 
 #include <string>
 
-#include "support/ChildProcess.h"
-#include "support/PrivateNamespace.h"
+#include "kit/ChildProcess.h"
+#include "kit/PrivateNamespace.h"
 
 namespace ZR {
 

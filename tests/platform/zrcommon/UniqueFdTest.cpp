@@ -6,7 +6,7 @@
 #include <string>
 #include <utility>
 
-#include "support/ChildProcess.h"
+#include "kit/ChildProcess.h"
 
 namespace ZR {
 

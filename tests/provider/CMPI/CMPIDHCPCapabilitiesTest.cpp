@@ -3,8 +3,8 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "CMPI/Host.h"
-#include "Tree.h"
+#include "kit/Host.h"
+#include "kit/Tree.h"
 #include "providerutilities/ProviderUtilities.h"
 
 namespace {

@@ -3,9 +3,9 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "CMPI/Host.h"
-#include "Tree.h"
-#include "support/LogCapture.h"
+#include "kit/Host.h"
+#include "kit/LogCapture.h"
+#include "kit/Tree.h"
 
 namespace {
 

@@ -6,8 +6,8 @@
 #include <array>
 
 #include "CMPI/ElementTables.h"
-#include "CMPI/Host.h"
-#include "Tree.h"
+#include "kit/Host.h"
+#include "kit/Tree.h"
 
 namespace {
 

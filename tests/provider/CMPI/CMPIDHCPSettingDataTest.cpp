@@ -5,10 +5,10 @@
 
 #include <filesystem>
 
-#include "CMPI/Host.h"
-#include "Tree.h"
+#include "kit/Files.h"
+#include "kit/Host.h"
+#include "kit/Tree.h"
 #include "providerutilities/ProviderUtilities.h"
-#include "support/Files.h"
 
 namespace {
 

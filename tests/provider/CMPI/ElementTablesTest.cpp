@@ -16,7 +16,7 @@
 #include "CMPI/CMPIDHCPRemoteServiceAccessPoint.h"
 #include "CMPI/CMPIDHCPSettingData.h"
 #include "CMPI/CMPISAPSAPDependency.h"
-#include "CMPI/Host.h"
+#include "kit/Host.h"
 
 namespace {
 

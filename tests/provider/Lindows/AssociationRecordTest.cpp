@@ -6,10 +6,10 @@
 #include <string>
 #include <vector>
 
-#include "Lindows/Builders.h"
+#include "Builders.h"
 #include "Lindows/DHCPProtocolEndpoint.h"
-#include "Tree.h"
-#include "support/LogCapture.h"
+#include "kit/LogCapture.h"
+#include "kit/Tree.h"
 
 namespace {
 

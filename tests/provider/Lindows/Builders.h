@@ -7,8 +7,8 @@
 #include <utility>
 #include <vector>
 
-#include "Tree.h"
 #include "include/Exceptions.h"
+#include "kit/Tree.h"
 #include "zrclient/Moniker.h"
 
 /// Running the builders of the association records: keys in, keys out.

@@ -23,11 +23,11 @@
 #include <string>
 #include <vector>
 
-#include "support/ChildProcess.h"
-#include "support/Files.h"
-#include "support/LogCapture.h"
-#include "support/PrivateNamespace.h"
-#include "support/TemporaryDirectory.h"
+#include "kit/ChildProcess.h"
+#include "kit/Files.h"
+#include "kit/LogCapture.h"
+#include "kit/PrivateNamespace.h"
+#include "kit/TemporaryDirectory.h"
 
 namespace {
 

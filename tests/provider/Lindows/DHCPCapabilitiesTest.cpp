@@ -5,8 +5,8 @@
 
 #include <optional>
 
-#include "Lindows/Elements.h"
-#include "Tree.h"
+#include "Elements.h"
+#include "kit/Tree.h"
 
 namespace {
 

@@ -5,9 +5,9 @@
 
 #include <optional>
 
-#include "Lindows/Elements.h"
-#include "Lindows/HostNameFake.h"
-#include "Tree.h"
+#include "Elements.h"
+#include "HostNameFake.h"
+#include "kit/Tree.h"
 
 namespace {
 

@@ -7,8 +7,8 @@
 #include <utility>
 #include <vector>
 
-#include "Lindows/Builders.h"
-#include "Tree.h"
+#include "Builders.h"
+#include "kit/Tree.h"
 
 namespace {
 

@@ -9,9 +9,9 @@
 #include <optional>
 #include <thread>
 
-#include "Lindows/Elements.h"
-#include "Tree.h"
-#include "support/Files.h"
+#include "Elements.h"
+#include "kit/Files.h"
+#include "kit/Tree.h"
 
 namespace {
 

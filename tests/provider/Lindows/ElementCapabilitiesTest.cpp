@@ -7,9 +7,9 @@
 #include <utility>
 #include <vector>
 
-#include "Lindows/Builders.h"
-#include "Tree.h"
-#include "support/LogCapture.h"
+#include "Builders.h"
+#include "kit/LogCapture.h"
+#include "kit/Tree.h"
 
 namespace {
 

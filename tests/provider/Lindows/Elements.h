@@ -8,8 +8,8 @@
 #include <string_view>
 #include <vector>
 
-#include "Tree.h"
-#include "support/LogCapture.h"
+#include "kit/LogCapture.h"
+#include "kit/Tree.h"
 #include "zrclient/Instrumentation.h"
 #include "zrclient/Snapshot.h"
 

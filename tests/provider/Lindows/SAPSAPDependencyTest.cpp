@@ -7,9 +7,9 @@
 #include <utility>
 #include <vector>
 
-#include "Lindows/Builders.h"
-#include "Lindows/Elements.h"
-#include "Tree.h"
+#include "Builders.h"
+#include "Elements.h"
+#include "kit/Tree.h"
 
 namespace {
 

@@ -12,8 +12,8 @@
 #include <string>
 #include <vector>
 
-#include "associations/Machine.h"
-#include "support/LogCapture.h"
+#include "kit/AssociationMachine.h"
+#include "kit/LogCapture.h"
 
 namespace {
 

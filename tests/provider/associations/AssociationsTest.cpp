@@ -7,9 +7,9 @@
 #include <string>
 #include <vector>
 
-#include "CMPI/Host.h"
-#include "associations/Machine.h"
-#include "support/LogCapture.h"
+#include "kit/AssociationMachine.h"
+#include "kit/Host.h"
+#include "kit/LogCapture.h"
 
 namespace {
 

@@ -11,9 +11,9 @@
 #include "CMPI/CMPIDHCPAssignmentSettingData.h"
 #include "CMPI/CMPIDHCPComputerSystem.h"
 #include "CMPI/CMPIIPProtocolEndpoint.h"
-#include "associations/Machine.h"
 #include "include/Exceptions.h"
-#include "support/LogCapture.h"
+#include "kit/AssociationMachine.h"
+#include "kit/LogCapture.h"
 
 namespace {
 

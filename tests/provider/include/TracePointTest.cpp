@@ -7,7 +7,7 @@
 #include <string>
 #include <vector>
 
-#include "support/LogCapture.h"
+#include "kit/LogCapture.h"
 
 namespace ZR {
 

@@ -8,7 +8,7 @@
 #include <thread>
 #include <vector>
 
-#include "support/LogCapture.h"
+#include "kit/LogCapture.h"
 
 namespace ZR {
 

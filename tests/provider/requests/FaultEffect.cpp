@@ -1,10 +1,10 @@
-#include "requests/FaultEffect.h"
+#include "FaultEffect.h"
 
 #include <algorithm>
 #include <map>
 
-#include "associations/Machine.h"
 #include "cimom/ObjectPathText.h"
+#include "kit/AssociationMachine.h"
 
 namespace test {
 

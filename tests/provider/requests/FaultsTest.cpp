@@ -10,11 +10,11 @@
 #include <string>
 #include <vector>
 
-#include "Tree.h"
-#include "requests/FaultEffect.h"
-#include "requests/Requests.h"
-#include "support/Files.h"
-#include "support/LogCapture.h"
+#include "FaultEffect.h"
+#include "Requests.h"
+#include "kit/Files.h"
+#include "kit/LogCapture.h"
+#include "kit/Tree.h"
 
 namespace {
 

@@ -1,6 +1,6 @@
-#include "requests/Requests.h"
+#include "Requests.h"
 
-#include "associations/Machine.h"
+#include "kit/AssociationMachine.h"
 
 namespace test {
 

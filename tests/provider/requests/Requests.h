@@ -4,7 +4,7 @@
 #include <string>
 #include <vector>
 
-#include "CMPI/Host.h"
+#include "kit/Host.h"
 
 namespace test {
 

@@ -12,8 +12,8 @@
 #include <string>
 #include <vector>
 
-#include "Tree.h"
-#include "requests/Requests.h"
+#include "Requests.h"
+#include "kit/Tree.h"
 #include "zrclient/Instrumentation.h"
 
 namespace {

@@ -17,9 +17,18 @@ namespace ZR {
 /// nothing changed a snapshot is handed out for the price of one poll.
 class InstrumentationService {
   public:
+    /// How the running machine is opened as a source; never null.
+    using OpenMachine = std::unique_ptr<SnapshotSource> (*)();
+
     /// The service of this process (of this library, when linked into one). Its
-    /// source is what the platform settings name, opened on first use.
+    /// source is the tree that the platform settings name, else the running machine,
+    /// opened on first use.
     static InstrumentationService& process();
+
+    /// Tells how the running machine is opened. The service knows no operating system:
+    /// who puts a library or a program together says so before the first request.
+    /// Without it, and without a tree in the settings, there is nothing to see.
+    static void setMachine(OpenMachine open) noexcept;
 
     explicit InstrumentationService(std::unique_ptr<SnapshotSource> source = nullptr);
 

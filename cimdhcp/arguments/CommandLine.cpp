@@ -1,0 +1,382 @@
+#include "arguments/CommandLine.h"
+
+#include <CLI/CLI.hpp>
+#include <algorithm>
+#include <map>
+#include <memory>
+#include <stdexcept>
+
+#include "arguments/HelpFormatter.h"
+#include "arguments/OptionGroups.h"
+#include "arguments/ServeOptions.h"
+#include "client/Failure.h"
+#include "text/DisplayText.h"
+
+namespace cimdhcp {
+
+namespace {
+
+constexpr const char* description =
+    "Shows and changes how the network interfaces of this machine use DHCP.\n"
+    "Everything is asked of the CIM provider of the machine's DHCP clients, in this\n"
+    "process: no object manager has to be installed or running. With --connect or\n"
+    "--hosts, the WBEM servers of other machines are asked.";
+
+constexpr const char* pathHelp =
+    "PATH names an instance as CLASS.KEY=\"VALUE\"[,KEY=\"VALUE\"...]; a namespace and a\n"
+    "colon may stand before it. Put it in single quotes for the shell, as in\n"
+    "  'QVXZR_DHCPSettingData.InstanceID=\"Computer%eth0\"'";
+
+constexpr const char* footer = R"(
+Examples:
+  cimdhcp show
+  cimdhcp rename eth0 office
+  cimdhcp instances QVXZR_DHCPProtocolEndpoint
+  cimdhcp get 'QVXZR_DHCPSettingData.InstanceID="Computer%eth0"'
+  cimdhcp --format json associators --names 'QVXZR_DHCPCapabilities.InstanceID="eth0"'
+  cimdhcp --tree machine.json show
+  cimdhcp serve
+  cimdhcp user add --users users --modify admin
+  cimdhcp --connect https://host.example show
+  cimdhcp --hosts hosts --credentials credentials show
+
+Exit status:
+  0  done
+  1  the answer is another CIM status than OK (its name is on standard error), or
+     a rename was not possible
+  2  the command line cannot be understood
+  3  the provider or a file cannot be loaded, a server not be reached or
+     understood, or the output not be written
+  4  some of several servers have failed
+  130  interrupted while servers were asked
+
+Schema, registrations and providers are those that are installed with the program,
+unless an advanced option or one of the environment variables CIMDHCP_SCHEMA_DIR,
+CIMDHCP_REGISTRATION_DIR and CIMDHCP_PROVIDER_DIR names others.
+
+"cimdhcp COMMAND --help" tells more about a command. The options above may stand
+before or behind the command.)";
+
+constexpr const char* machineGroup = "The machine";
+constexpr const char* classGroup = "Classes and instances";
+constexpr const char* associationGroup = "Associations";
+constexpr const char* serverGroup = "The WBEM server";
+constexpr const char* advancedGroup = "Advanced options";
+
+/// Whether an option of the program or of any command takes a value.
+bool takesValue(const CLI::App& app, const std::string& option) {
+    const CLI::Option* const found = app.get_option_no_throw(option);
+    if (found != nullptr && found->get_items_expected_max() > 0) {
+        return true;
+    }
+    const auto commands = app.get_subcommands([](const CLI::App*) { return true; });
+    return std::any_of(commands.begin(), commands.end(),
+                       [&](const CLI::App* command) { return takesValue(*command, option); });
+}
+
+/// "--option=" as an option and an empty value, which the parser would look for in the
+/// next argument.
+std::vector<std::string> withEmptyValues(const CLI::App& app,
+                                         const std::vector<std::string>& arguments) {
+    std::vector<std::string> result;
+    bool operandsOnly = false;
+    for (const std::string& argument : arguments) {
+        operandsOnly = operandsOnly || argument == "--";
+        const bool noValue =
+            argument.starts_with("--") && argument.find('=') + 1 == argument.size();
+        const std::string option = argument.substr(0, argument.find('='));
+        if (!operandsOnly && noValue && takesValue(app, option)) {
+            result.push_back(option);
+            result.emplace_back();
+        } else {
+            result.push_back(argument);
+        }
+    }
+    return result;
+}
+
+/// What stands behind the commands' names while a line is being read.
+struct Records {
+    ShowCommand show;
+    RenameCommand rename;
+    GraphCommand graph;
+    TreeCommand tree;
+    ClassesCommand classes;
+    NamesCommand names;
+    InstancesCommand instances;
+    GetCommand get;
+    ModifyCommand modify;
+    AssociatorsCommand associators;
+    ReferencesCommand references;
+    ServeCommand serve;
+    UserAddCommand userAdd;
+    CheckCommand check;
+};
+
+}  // namespace
+
+/// The parser, and where it puts what it reads.
+class CommandLineReader::Parser {
+  public:
+    Parser() : app_(description, "cimdhcp") {
+        app_.formatter(std::make_shared<HelpFormatter>());
+        app_.set_version_flag("--version", "cimdhcp " CIMDHCP_VERSION, "Print the version");
+        app_.set_help_flag("-h,--help", "Print this help");
+        // Options may stand behind the command, too.
+        app_.fallthrough();
+        // One at most; that there is one is checked below, in better words.
+        app_.require_subcommand(0, 1);
+        addOptions();
+        addMachineCommands();
+        addInstanceCommands();
+        addAssociationCommands();
+        addServerCommands();
+        // Commands made after this would take the footer over.
+        app_.footer(std::string(pathHelp) + '\n' + footer);
+    }
+
+    std::variant<CommandLine, Information> read(const std::vector<std::string>& arguments) {
+        line_ = {};
+        records_ = {};
+        try {
+            // The parser takes them from the end.
+            const std::vector<std::string> whole = withEmptyValues(app_, arguments);
+            app_.parse(std::vector<std::string>(whole.rbegin(), whole.rend()));
+        } catch (const CLI::CallForHelp&) {
+            return Information{app_.help()};
+        } catch (const CLI::CallForVersion& version) {
+            return Information{std::string(version.what()) + '\n'};
+        } catch (const CLI::ParseError& error) {
+            refuse(reasonOf(error));
+        }
+        if (app_.get_subcommands().empty()) {
+            refuse("a command is missing");
+        }
+        normalize();
+        return line_;
+    }
+
+  private:
+    [[noreturn]] static void refuse(const std::string& reason) {
+        throw Failure(ExitStatus::usage, reason + " (\"cimdhcp --help\" tells more)");
+    }
+
+    [[nodiscard]] std::string reasonOf(const CLI::ParseError& error) const {
+        const bool extra = dynamic_cast<const CLI::ExtrasError*>(&error) != nullptr;
+        const std::vector<std::string> rest = app_.remaining();
+        if (extra && app_.get_subcommands().empty() && !rest.empty() &&
+            !rest.front().starts_with('-')) {
+            return "there is no command \"" + printable(rest.front()) + '"';
+        }
+        return printable(error.what());
+    }
+
+    void addOptions() {
+        app_.add_option("--tree", line_.options.tree, "A JSON tree in place of the live machine")
+            ->type_name("FILE");
+        app_.add_option("--data-dir", line_.options.dataDir,
+                        "Directory of the ifcfg-INTERFACE files")
+            ->type_name("DIR");
+        app_.add_option("--namespace", line_.options.nameSpace,
+                        "The CIM namespace; root/cimv2 if none is given")
+            ->type_name("NS");
+        const std::map<std::string, Format> formats{
+            {"table", Format::table}, {"mof", Format::mof}, {"json", Format::json}};
+        app_.add_option_function<std::string>(
+                "--format",
+                [this, formats](const std::string& name) {
+                    line_.options.format = formats.at(name);
+                },
+                "table (the default), mof or json")
+            ->type_name("FORMAT")
+            ->check([formats](const std::string& name) {
+                return formats.contains(name)
+                           ? std::string()
+                           : "there is no format \"" + name + "\", only table, mof and json";
+            });
+        addRemoteOptions(app_, line_.options);
+        addOutputOptions(app_, line_.options);
+        app_.add_option("--schema-dir", line_.options.schemaDir, "Directory of the *.mof files")
+            ->type_name("DIR")
+            ->envname("CIMDHCP_SCHEMA_DIR")
+            ->group(advancedGroup);
+        app_.add_option("--registration-dir", line_.options.registrationDir,
+                        "Directory of the *.registration files")
+            ->type_name("DIR")
+            ->envname("CIMDHCP_REGISTRATION_DIR")
+            ->group(advancedGroup);
+        app_.add_option("--provider-dir", line_.options.providerDir,
+                        "Directory of the provider libraries")
+            ->type_name("DIR")
+            ->envname("CIMDHCP_PROVIDER_DIR")
+            ->group(advancedGroup);
+    }
+
+    /// A command whose arguments are read into a record of its own.
+    template <typename Record>
+    CLI::App* command(const char* name, const char* group, const std::string& text,
+                      Record& record) {
+        CLI::App* const app = app_.add_subcommand(name, text);
+        app->group(group);
+        app->callback([this, &record] { line_.command = record; });
+        return app;
+    }
+
+    void addMachineCommands() {
+        command("show", machineGroup, "The network interfaces and their DHCP clients",
+                records_.show);
+        CLI::App* const rename = command(
+            "rename", machineGroup, "Change an interface's configuration name", records_.rename);
+        rename
+            ->add_option("INTERFACE", records_.rename.interfaceName, "The interface, such as eth0")
+            ->required();
+        rename->add_option("NAME", records_.rename.name, "The new configuration name")->required();
+        rename->add_flag("--create", records_.rename.create,
+                         "Make the interface's configuration file if there is none");
+        CLI::App* const graph = command("graph", machineGroup,
+                                        "Instances and associations, for Graphviz", records_.graph);
+        graph->add_flag("--svg", records_.graph.svg, "Draw it as SVG (needs the package graphviz)");
+        CLI::App* const tree = command(
+            "tree", machineGroup, "What is known of the machine, as a JSON tree", records_.tree);
+        tree->add_flag("--explain", records_.tree.explain,
+                       "With each property, where it came from and why that counts");
+    }
+
+    void addInstanceCommands() {
+        command("classes", classGroup, "The served classes", records_.classes);
+        CLI::App* const names =
+            command("names", classGroup, "The paths of a class' instances", records_.names);
+        names->add_option("CLASS", records_.names.className, "The class, or a parent of it")
+            ->required();
+        CLI::App* const instances =
+            command("instances", classGroup, "The instances of a class", records_.instances);
+        instances->add_option("CLASS", records_.instances.className, "The class, or a parent of it")
+            ->required();
+        CLI::App* const get = command("get", classGroup, "One instance", records_.get);
+        addPath(get, records_.get.path);
+        CLI::App* const modify =
+            command("modify", classGroup, "Change properties of an instance", records_.modify);
+        addPath(modify, records_.modify.path);
+        modify
+            ->add_option("PROPERTY=VALUE", records_.modify.assignments,
+                         "What to change; an array is {VALUE, VALUE...}")
+            ->required();
+    }
+
+    void addAssociationCommands() {
+        CLI::App* const associators =
+            command("associators", associationGroup, "What is associated with an instance",
+                    records_.associators);
+        addPath(associators, records_.associators.path);
+        associators->add_flag("--names", records_.associators.names, "Their paths alone");
+        addFilter(associators, "--assoc-class", records_.associators.assocClass, "CLASS",
+                  "Through associations of this class only");
+        addFilter(associators, "--result-class", records_.associators.resultClass, "CLASS",
+                  "Instances of this class only");
+        addFilter(associators, "--role", records_.associators.role, "PROPERTY",
+                  "Only where PATH stands in this reference");
+        addFilter(associators, "--result-role", records_.associators.resultRole, "PROPERTY",
+                  "Only what stands in this reference");
+        CLI::App* const references = command(
+            "references", associationGroup, "The associations of an instance", records_.references);
+        addPath(references, records_.references.path);
+        references->add_flag("--names", records_.references.names, "Their paths alone");
+        addFilter(references, "--result-class", records_.references.resultClass, "CLASS",
+                  "Associations of this class only");
+        addFilter(references, "--role", records_.references.role, "PROPERTY",
+                  "Only where PATH stands in this reference");
+    }
+
+    void addServerCommands() {
+        CLI::App* const serve =
+            command("serve", serverGroup, "Answer WBEM clients: CIM-XML over HTTP", records_.serve);
+        command("check", serverGroup, "Tell why something is empty or does not work",
+                records_.check);
+        addServeOptions(*serve, records_.serve);
+        CLI::App* const user = app_.add_subcommand("user", "The users of the server");
+        user->group(serverGroup)->require_subcommand(1);
+        CLI::App* const add = user->add_subcommand(
+            "add",
+            "Add a user, or change role and password.\nThe password is asked for, or read from "
+            "standard input.");
+        add->callback([this] { line_.command = records_.userAdd; });
+        add->add_option("NAME", records_.userAdd.name, "The user")->required();
+        add->add_option("--users", records_.userAdd.users, "The users file; made if there is none")
+            ->type_name("FILE")
+            ->required();
+        add->add_flag("--modify", records_.userAdd.mayModify, "The user may modify, not only read");
+    }
+
+    static void addPath(CLI::App* app, std::string& path) {
+        app->add_option("PATH", path, "The instance")->required();
+        app->footer(pathHelp);
+    }
+
+    static void addFilter(CLI::App* app, const char* option, std::optional<std::string>& value,
+                          const char* type, const char* text) {
+        app->add_option(option, value, text)->type_name(type);
+    }
+
+    void normalize() {
+        Options& options = line_.options;
+        std::string& nameSpace = options.nameSpace;
+        nameSpace.erase(0, nameSpace.find_first_not_of('/'));
+        nameSpace.erase(nameSpace.find_last_not_of('/') + 1);
+        if (nameSpace.empty()) {
+            throw Failure(ExitStatus::usage, "--namespace needs a name, such as root/cimv2");
+        }
+        for (const auto& [name, value] :
+             {std::pair{"--tree", &options.tree}, std::pair{"--data-dir", &options.dataDir}}) {
+            if (*value && (*value)->empty()) {
+                throw Failure(ExitStatus::usage, std::string(name) + " needs a name");
+            }
+        }
+        if (options.format == Format::json && std::holds_alternative<GraphCommand>(line_.command)) {
+            throw Failure(ExitStatus::usage,
+                          "a graph has no JSON output; it is in Graphviz' language, or with --svg "
+                          "drawn");
+        }
+        if (const auto* const serve = std::get_if<ServeCommand>(&line_.command)) {
+            try {
+                serve->limits.check();
+            } catch (const std::invalid_argument& error) {
+                throw Failure(ExitStatus::usage, std::string("--") + error.what());
+            }
+        }
+        checkOptionsFor(line_);
+        if (options.format == Format::mof && !hasMofForm()) {
+            throw Failure(ExitStatus::usage,
+                          "this command has no MOF output; use --format table or json");
+        }
+    }
+
+    [[nodiscard]] bool hasMofForm() const {
+        return !std::holds_alternative<ShowCommand>(line_.command) &&
+               !std::holds_alternative<RenameCommand>(line_.command) &&
+               !std::holds_alternative<GraphCommand>(line_.command) &&
+               !std::holds_alternative<TreeCommand>(line_.command) &&
+               !std::holds_alternative<ClassesCommand>(line_.command) &&
+               !std::holds_alternative<ServeCommand>(line_.command) &&
+               !std::holds_alternative<UserAddCommand>(line_.command) &&
+               !std::holds_alternative<CheckCommand>(line_.command);
+    }
+
+    CommandLine line_;
+    Records records_;
+    CLI::App app_;
+};
+
+CommandLineReader::CommandLineReader() : parser_(std::make_unique<Parser>()) {}
+
+CommandLineReader::~CommandLineReader() = default;
+
+std::variant<CommandLine, Information> CommandLineReader::read(
+    const std::vector<std::string>& arguments) {
+    return parser_->read(arguments);
+}
+
+std::variant<CommandLine, Information> readCommandLine(const std::vector<std::string>& arguments) {
+    return CommandLineReader().read(arguments);
+}
+
+}  // namespace cimdhcp

@@ -1,0 +1,57 @@
+#include "arguments/HelpFormatter.h"
+
+#include <sstream>
+
+namespace cimdhcp {
+
+namespace {
+
+constexpr std::size_t columnWidth = 34;
+
+/// " INTERFACE NAME": what stands behind a command.
+std::string arguments(const CLI::App* app) {
+    std::string text;
+    for (const CLI::Option* const option : app->get_options()) {
+        if (option->get_positional()) {
+            const bool several = option->get_expected_max() > 1;
+            text += ' ' + option->get_name(true) + (several ? "..." : "");
+        }
+    }
+    return text;
+}
+
+}  // namespace
+
+HelpFormatter::HelpFormatter() {
+    column_width(columnWidth);
+    label("Positionals", "Arguments");
+}
+
+std::string HelpFormatter::make_help(const CLI::App* app, std::string name,
+                                     CLI::AppFormatMode mode) const {
+    // Groups bring a blank line each, and one more between two of them.
+    const std::string options =
+        CLI::detail::find_and_replace(make_groups(app, mode), "\n\n\n", "\n\n");
+    const std::string footer = make_footer(app);
+    return make_usage(app, std::move(name)) + '\n' + make_description(app) + make_positionals(app) +
+           make_subcommands(app, mode) + options + (footer.empty() ? "" : "\n") + footer;
+}
+
+std::string HelpFormatter::make_usage(const CLI::App* app, std::string name) const {
+    const bool main = app->get_parent() == nullptr;
+    return "Usage: " + name + (main ? " [OPTIONS] COMMAND" : " [OPTIONS]" + arguments(app)) + '\n';
+}
+
+std::string HelpFormatter::make_subcommand(const CLI::App* sub) const {
+    std::ostringstream out;
+    CLI::detail::format_help(out, sub->get_name() + arguments(sub), sub->get_description(),
+                             columnWidth);
+    return out.str();
+}
+
+std::string HelpFormatter::make_option_opts(const CLI::Option* option) const {
+    const std::string type = option->get_positional() ? "" : option->get_type_name();
+    return type.empty() ? std::string() : ' ' + type;
+}
+
+}  // namespace cimdhcp

@@ -1,0 +1,20 @@
+#pragma once
+
+#include <string>
+
+#include "cimom/Cim.h"
+#include "client/ClassLookup.h"
+
+namespace cimdhcp {
+
+/// Reads the name of a class, which may have a namespace before it. Throws Failure.
+[[nodiscard]] cimom::ObjectPath readClassArgument(const std::string& text,
+                                                  const std::string& defaultNamespace);
+
+/// Reads the path of an instance. A class that has keys wants at least one of them
+/// in the path: without any it would name a class. Throws Failure.
+[[nodiscard]] cimom::ObjectPath readPathArgument(const std::string& text,
+                                                 const std::string& defaultNamespace,
+                                                 const ClassLookup& classes);
+
+}  // namespace cimdhcp

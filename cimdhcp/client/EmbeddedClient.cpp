@@ -1,0 +1,121 @@
+#include "client/EmbeddedClient.h"
+
+#include <algorithm>
+#include <utility>
+
+#include "client/StatusMessage.h"
+#include "text/DisplayText.h"
+#include "zrclient/InstrumentationService.h"
+#include "zrcommon/PlatformUtilities.h"
+
+namespace cimdhcp {
+
+namespace {
+
+Answer answerOf(const char* operation, cimom::PathsResult result) {
+    return {
+        operation, std::move(result.status), result.returnDoneCalls, std::move(result.paths), {}};
+}
+
+Answer answerOf(const char* operation, cimom::InstancesResult result) {
+    return {operation,
+            std::move(result.status),
+            result.returnDoneCalls,
+            {},
+            std::move(result.instances)};
+}
+
+}  // namespace
+
+EmbeddedClient::EmbeddedClient(const Directories& directories, std::string nameSpace)
+    : Client(std::move(nameSpace)) {
+    cimom::Configuration configuration;
+    configuration.schemaDirectories = {directories.schema};
+    configuration.registrationFiles = registrationFiles(directories.registrations);
+    configuration.providerDirectories = directories.providers;
+    try {
+        manager_ = std::make_unique<cimom::ObjectManager>(std::move(configuration));
+    } catch (const cimom::MofError& error) {
+        throw Failure(ExitStatus::notLoaded, printable(error.what()));
+    } catch (const cimom::LoadError& error) {
+        throw Failure(ExitStatus::notLoaded, printable(error.what()));
+    }
+}
+
+const cimom::ClassRepository& EmbeddedClient::repository() const noexcept {
+    return manager_->repository();
+}
+
+const std::vector<cimom::Registration>& EmbeddedClient::registrations() const noexcept {
+    return manager_->registrations();
+}
+
+std::vector<ClassEntry> EmbeddedClient::servedClasses() {
+    return cimdhcp::servedClasses(registrations(), repository());
+}
+
+bool EmbeddedClient::mayServe(std::string_view className) const {
+    return std::any_of(registrations().begin(), registrations().end(),
+                       [className](const cimom::Registration& registration) {
+                           return registration.instance &&
+                                  cimom::sameName(registration.className, className);
+                       });
+}
+
+MachineInterfaces EmbeddedClient::interfaces(const ServedInstances& /*served*/) {
+    const auto snapshot = ZR::InstrumentationService::process().current();
+    const auto remarks = snapshot->remarks();
+    return {interfacesOf(*snapshot), {remarks.begin(), remarks.end()}};
+}
+
+std::optional<std::string> EmbeddedClient::dataDir() const {
+    return ZR::PlatformUtilities::getKestraDataDir();
+}
+
+Answer EmbeddedClient::enumerateNames(const cimom::ObjectPath& path) {
+    return answerOf("EnumerateInstanceNames", manager_->enumerateInstanceNames(path));
+}
+
+Answer EmbeddedClient::enumerate(const cimom::ObjectPath& path) {
+    return answerOf("EnumerateInstances", manager_->enumerateInstances(path));
+}
+
+Answer EmbeddedClient::get(const cimom::ObjectPath& path) {
+    return answerOf("GetInstance", manager_->getInstance(path));
+}
+
+Answer EmbeddedClient::modify(const cimom::Instance& instance) {
+    cimom::InstanceRequest request;
+    request.propertyList.emplace();
+    for (const cimom::NamedValue& property : instance.properties) {
+        request.propertyList->push_back(property.name);
+    }
+    return answerOf("ModifyInstance", manager_->modifyInstance(instance, request));
+}
+
+Answer EmbeddedClient::associatorNames(const cimom::ObjectPath& path,
+                                       const cimom::AssociationRequest& request) {
+    return answerOf("AssociatorNames", manager_->associatorNames(path, request));
+}
+
+Answer EmbeddedClient::associators(const cimom::ObjectPath& path,
+                                   const cimom::AssociationRequest& request) {
+    return answerOf("Associators", manager_->associators(path, request));
+}
+
+Answer EmbeddedClient::referenceNames(const cimom::ObjectPath& path,
+                                      const cimom::AssociationRequest& request) {
+    return answerOf("ReferenceNames", manager_->referenceNames(path, request));
+}
+
+Answer EmbeddedClient::references(const cimom::ObjectPath& path,
+                                  const cimom::AssociationRequest& request) {
+    return answerOf("References", manager_->references(path, request));
+}
+
+Failure EmbeddedClient::failure(const Answer& answer, const cimom::ObjectPath& asked) const {
+    return {answer.status.noProvider ? ExitStatus::notLoaded : ExitStatus::notDone,
+            statusMessage(answer, asked)};
+}
+
+}  // namespace cimdhcp

@@ -1,0 +1,50 @@
+#pragma once
+
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "arguments/Directories.h"
+#include "client/Client.h"
+
+namespace cimdhcp {
+
+/// The object manager of this process with the providers that are installed.
+class EmbeddedClient : public Client {
+  public:
+    /// Reads schema and registrations. Throws Failure with ExitStatus::notLoaded.
+    EmbeddedClient(const Directories& directories, std::string nameSpace);
+
+    [[nodiscard]] const cimom::ClassRepository& repository() const noexcept;
+    [[nodiscard]] const std::vector<cimom::Registration>& registrations() const noexcept;
+    [[nodiscard]] cimom::ObjectManager& manager() noexcept { return *manager_; }
+
+    [[nodiscard]] ClassLookup classes() override { return repository(); }
+    [[nodiscard]] std::vector<ClassEntry> servedClasses() override;
+    [[nodiscard]] bool mayServe(std::string_view className) const override;
+    /// Those of the newest snapshot of the instrumentation.
+    [[nodiscard]] MachineInterfaces interfaces(const ServedInstances& served) override;
+    [[nodiscard]] std::optional<std::string> dataDir() const override;
+
+    Answer enumerateNames(const cimom::ObjectPath& path) override;
+    Answer enumerate(const cimom::ObjectPath& path) override;
+    Answer get(const cimom::ObjectPath& path) override;
+    Answer modify(const cimom::Instance& instance) override;
+    Answer associatorNames(const cimom::ObjectPath& path,
+                           const cimom::AssociationRequest& request) override;
+    Answer associators(const cimom::ObjectPath& path,
+                       const cimom::AssociationRequest& request) override;
+    Answer referenceNames(const cimom::ObjectPath& path,
+                          const cimom::AssociationRequest& request) override;
+    Answer references(const cimom::ObjectPath& path,
+                      const cimom::AssociationRequest& request) override;
+
+    /// With notLoaded when the provider's library is the reason, else notDone.
+    [[nodiscard]] Failure failure(const Answer& answer,
+                                  const cimom::ObjectPath& asked) const override;
+
+  private:
+    std::unique_ptr<cimom::ObjectManager> manager_;  // never null
+};
+
+}  // namespace cimdhcp

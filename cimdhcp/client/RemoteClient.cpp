@@ -1,0 +1,341 @@
+#include "client/RemoteClient.h"
+
+#include <algorithm>
+#include <unordered_set>
+#include <utility>
+
+#include "cimxml/ClassReader.h"
+#include "cimxml/Errors.h"
+#include "client/StatusMessage.h"
+#include "text/DisplayText.h"
+
+namespace cimdhcp {
+
+namespace {
+
+using cimom::wbem::OperationRequest;
+using cimom::wbem::OperationResponse;
+
+constexpr std::size_t deepestXml = 64;
+constexpr unsigned httpOk = 200;
+constexpr unsigned httpUnauthorized = 401;
+constexpr unsigned httpForbidden = 403;
+/// The schema of the standard's own classes, none of which an implementation serves.
+constexpr std::string_view standardSchema = "CIM_";
+
+[[noreturn]] void fail(const std::string& message) {
+    throw Failure(ExitStatus::notLoaded, message);
+}
+
+/// Text of a server in a message of one line.
+std::string excerpt(const std::string& text) {
+    constexpr std::size_t shown = 200;
+    return printable(text.size() > shown ? text.substr(0, shown) + "..." : text);
+}
+
+void checkReply(const HttpReply& reply, const HttpSettings& settings) {
+    if (reply.status == httpOk) {
+        return;
+    }
+    if (reply.status == httpUnauthorized) {
+        fail(settings.credential
+                 ? "HTTP 401: it refuses user " + printable(settings.credential->user) +
+                       " with that password"
+                 : "HTTP 401: it wants a user and a password; --credentials FILE holds them");
+    }
+    if (reply.status == httpForbidden) {
+        fail("HTTP 403: it does not permit this");
+    }
+    const std::string* const cimError = reply.header("CIMError");
+    fail("HTTP " + std::to_string(reply.status) + " in place of an answer" +
+         (cimError == nullptr || cimError->empty() ? "" : ": " + excerpt(*cimError)));
+}
+
+/// The status of an answer. Statuses that CMPI's type has no room for do not exist.
+cimom::Status statusOf(const OperationResponse& response) {
+    constexpr unsigned last = 255;
+    std::string words = response.description;
+    if (cimom::sameName(words, cimom::wbem::cimStatusName(response.code))) {
+        words.clear();  // so that it can be told what the status means
+    }
+    if (response.code > last) {
+        return {CMPI_RC_ERR_FAILED,
+                "status " + std::to_string(response.code) + (words.empty() ? "" : ": " + words)};
+    }
+    return {static_cast<CMPIrc>(response.code), std::move(words)};
+}
+
+OperationRequest reading(const char* method, const cimom::ObjectPath& path) {
+    return {method, path.nameSpace};
+}
+
+/// What every operation that answers instances is told about them.
+void addForm(OperationRequest& request) {
+    request.flag("IncludeQualifiers", false).flag("IncludeClassOrigin", false);
+}
+
+OperationRequest aboutAssociations(const char* method, const cimom::ObjectPath& path,
+                                   const cimom::AssociationRequest& filter) {
+    OperationRequest request(method, path.nameSpace);
+    request.instanceName("ObjectName", path)
+        .className("AssocClass", filter.assocClass)
+        .className("ResultClass", filter.resultClass)
+        .text("Role", filter.role)
+        .text("ResultRole", filter.resultRole);
+    return request;
+}
+
+/// The path of an instance that came without one, since GetInstance does not repeat
+/// it: what was asked for. When that lacks keys, those of the class, in the instance's
+/// order.
+cimom::ObjectPath wholePath(const cimom::Instance& instance, const cimom::ObjectPath& asked,
+                            const cimom::ClassDeclaration* declaration) {
+    cimom::ObjectPath path = asked;
+    path.className = instance.path.className;
+    const auto isMissing = [&](const cimom::PropertyDeclaration& property) {
+        return property.isKey() && path.key(property.name) == nullptr;
+    };
+    if (declaration == nullptr ||
+        std::none_of(declaration->properties.begin(), declaration->properties.end(), isMissing)) {
+        return path;
+    }
+    std::vector<cimom::NamedValue> keys;
+    for (const cimom::NamedValue& property : instance.properties) {
+        const cimom::PropertyDeclaration* const declared = declaration->property(property.name);
+        if (declared != nullptr && declared->isKey() && !property.value.isNull()) {
+            keys.push_back(property);
+        }
+    }
+    path.keys = std::move(keys);
+    return path;
+}
+
+/// The classes that no other one derives from and that are not the standard's own. A
+/// class below an association is one, too.
+std::vector<ClassEntry> leavesOf(const std::vector<ClassEntry>& classes) {
+    constexpr int deepest = 64;  // a hierarchy that goes round in circles has no end
+    std::unordered_map<std::string_view, const ClassEntry*> byName;
+    std::unordered_set<std::string_view> parents;
+    for (const ClassEntry& entry : classes) {
+        byName[entry.name] = &entry;
+        parents.insert(entry.superclass);
+    }
+    std::vector<ClassEntry> leaves;
+    for (const ClassEntry& entry : classes) {
+        if (parents.contains(entry.name) || entry.name.starts_with(standardSchema)) {
+            continue;
+        }
+        leaves.push_back(entry);
+        auto above = byName.find(entry.name);
+        for (int depth = 0; above != byName.end() && depth < deepest; ++depth) {
+            leaves.back().association = leaves.back().association || above->second->association;
+            above = byName.find(above->second->superclass);
+        }
+    }
+    return leaves;
+}
+
+}  // namespace
+
+RemoteClient::RemoteClient(const ServerUrl& url, HttpSettings settings, const Deadline& deadline,
+                           std::string nameSpace)
+    : Client(std::move(nameSpace)), connection_(url, std::move(settings), deadline) {}
+
+OperationResponse RemoteClient::ask(const OperationRequest& request) {
+    try {
+        const HttpReply reply = connection_.post(
+            {"Content-Type: application/xml; charset=\"utf-8\"",
+             "Accept: application/xml, text/xml", "CIMOperation: MethodCall",
+             "CIMMethod: " + request.method(), "CIMObject: " + request.objectHeader()},
+            request.body());
+        checkReply(reply, connection_.settings());
+        return cimom::wbem::readResponse(reply.body, request.method(), deepestXml);
+    } catch (const ConnectionError& error) {
+        fail(error.what());
+    } catch (const cimom::wbem::XmlError& error) {
+        fail("the answer is no XML: " + excerpt(error.what()));
+    } catch (const cimom::wbem::NotValid& error) {
+        fail("the answer is no CIM-XML: " + excerpt(error.what()));
+    }
+}
+
+template <typename Read>
+Answer RemoteClient::answerTo(const OperationRequest& request, const Read& read) {
+    OperationResponse response = ask(request);
+    Answer answer;
+    answer.operation = request.method();
+    answer.status = statusOf(response);
+    answer.returnDoneCalls.reset();
+    try {
+        for (const cimom::wbem::XmlElement& element : response.returned) {
+            read(element, answer);
+        }
+    } catch (const cimom::wbem::NotValid& error) {
+        fail("the answer is no CIM-XML: " + excerpt(error.what()));
+    } catch (const cimom::wbem::CimError& error) {
+        fail("the answer holds what is no value: " + excerpt(error.what()));
+    }
+    return answer;
+}
+
+Answer RemoteClient::pathsOf(const OperationRequest& request) {
+    return answerTo(request, [&request](const cimom::wbem::XmlElement& element, Answer& answer) {
+        answer.paths.emplace_back(cimom::wbem::readReturnedPath(element, request.nameSpace()));
+    });
+}
+
+Answer RemoteClient::instancesOf(const OperationRequest& request) {
+    return answerTo(request, [&request](const cimom::wbem::XmlElement& element, Answer& answer) {
+        answer.instances.emplace_back(
+            cimom::wbem::readReturnedInstance(element, request.nameSpace()));
+    });
+}
+
+Answer RemoteClient::enumerateNames(const cimom::ObjectPath& path) {
+    return pathsOf(reading("EnumerateInstanceNames", path).className("ClassName", path.className));
+}
+
+Answer RemoteClient::enumerate(const cimom::ObjectPath& path) {
+    OperationRequest request = reading("EnumerateInstances", path);
+    request.className("ClassName", path.className)
+        .flag("LocalOnly", false)
+        .flag("DeepInheritance", true);
+    addForm(request);
+    return instancesOf(request);
+}
+
+Answer RemoteClient::get(const cimom::ObjectPath& path) {
+    OperationRequest request = reading("GetInstance", path);
+    request.instanceName("InstanceName", path).flag("LocalOnly", false);
+    addForm(request);
+    Answer answer = instancesOf(request);
+    for (auto& instance : answer.instances) {
+        instance->path = wholePath(*instance, path, findClass(instance->path.className));
+        // Servers add what the class has and the provider did not say, as null, which
+        // means the same as leaving it out (DSP0201, 5.2.5).
+        std::erase_if(instance->properties,
+                      [](const cimom::NamedValue& each) { return each.value.isNull(); });
+    }
+    return answer;
+}
+
+Answer RemoteClient::modify(const cimom::Instance& instance) {
+    std::vector<std::string> names;
+    for (const cimom::NamedValue& property : instance.properties) {
+        names.push_back(property.name);
+    }
+    OperationRequest request("ModifyInstance", instance.path.nameSpace);
+    request.namedInstance("ModifiedInstance", instance)
+        .flag("IncludeQualifiers", false)
+        .texts("PropertyList", names);
+    return instancesOf(request);
+}
+
+Answer RemoteClient::associatorNames(const cimom::ObjectPath& path,
+                                     const cimom::AssociationRequest& request) {
+    return pathsOf(aboutAssociations("AssociatorNames", path, request));
+}
+
+Answer RemoteClient::associators(const cimom::ObjectPath& path,
+                                 const cimom::AssociationRequest& request) {
+    OperationRequest message = aboutAssociations("Associators", path, request);
+    addForm(message);
+    return instancesOf(message);
+}
+
+Answer RemoteClient::referenceNames(const cimom::ObjectPath& path,
+                                    const cimom::AssociationRequest& request) {
+    return pathsOf(aboutAssociations("ReferenceNames", path, request));
+}
+
+Answer RemoteClient::references(const cimom::ObjectPath& path,
+                                const cimom::AssociationRequest& request) {
+    OperationRequest message = aboutAssociations("References", path, request);
+    addForm(message);
+    return instancesOf(message);
+}
+
+const cimom::ClassDeclaration* RemoteClient::findClass(std::string_view className) {
+    const std::string name(className);
+    const auto known = classes_.find(name);
+    if (known != classes_.end()) {
+        return known->second.get();
+    }
+    OperationRequest request("GetClass", nameSpace());
+    request.className("ClassName", name)
+        .flag("LocalOnly", false)
+        .flag("IncludeQualifiers", true)
+        .flag("IncludeClassOrigin", false);
+    std::unique_ptr<const cimom::ClassDeclaration> declaration;
+    // A server that knows the class and does not show it is as good as one that does
+    // not know it: values stand without their meanings.
+    static_cast<void>(
+        answerTo(request, [&declaration](const cimom::wbem::XmlElement& element, Answer&) {
+            declaration =
+                std::make_unique<const cimom::ClassDeclaration>(cimom::wbem::readClass(element));
+        }));
+    return classes_.emplace(name, std::move(declaration)).first->second.get();
+}
+
+ClassLookup RemoteClient::classes() {
+    return ClassLookup([this](std::string_view name) { return findClass(name); });
+}
+
+std::vector<ClassEntry> RemoteClient::servedClasses() {
+    OperationRequest request("EnumerateClasses", nameSpace());
+    request.flag("DeepInheritance", true)
+        .flag("LocalOnly", true)
+        .flag("IncludeQualifiers", false)
+        .flag("IncludeClassOrigin", false);
+    std::vector<ClassEntry> classes;
+    const Answer answer =
+        answerTo(request, [&](const cimom::wbem::XmlElement& element, Answer& /*answer*/) {
+            cimom::ClassDeclaration declaration = cimom::wbem::readClass(element);
+            // Only associations have references (DSP0004, 5.1.2.7).
+            const bool association =
+                std::any_of(declaration.properties.begin(), declaration.properties.end(),
+                            [](const auto& each) { return each.type == cimom::Type::reference; });
+            classes.push_back({std::move(declaration.name),
+                               std::move(declaration.superclass),
+                               association,
+                               "",
+                               {nameSpace()}});
+        });
+    if (!answer.status.ok()) {
+        throw failure(answer, classPath(""));
+    }
+    return leavesOf(classes);
+}
+
+bool RemoteClient::mayServe(std::string_view /*className*/) const {
+    return true;
+}
+
+MachineInterfaces RemoteClient::interfaces(const ServedInstances& served) {
+    const std::vector<cimom::Instance> nothing;
+    const auto endpoints = cimdhcp::instancesOf(*this, "QVXZR_IPProtocolEndpoint");
+    const Answer systems = enumerateNames(classPath("QVXZR_SPComputerSystem"));
+    std::vector<std::string> processors;
+    // A server without the class has no service processor to tell of.
+    for (const auto& path : systems.paths) {
+        const cimom::Value* const name = path->key("Name");
+        const cimom::Scalar* const scalar = name == nullptr ? nullptr : name->scalar();
+        const auto* const text = scalar == nullptr ? nullptr : std::get_if<std::string>(scalar);
+        if (text != nullptr) {
+            processors.push_back(*text);
+        }
+    }
+    return {interfacesOf(served.settings ? *served.settings : nothing,
+                         endpoints ? *endpoints : nothing, processors),
+            {}};
+}
+
+std::optional<std::string> RemoteClient::dataDir() const {
+    return std::nullopt;
+}
+
+Failure RemoteClient::failure(const Answer& answer, const cimom::ObjectPath& asked) const {
+    return {ExitStatus::notDone, statusMessage(answer, asked)};
+}
+
+}  // namespace cimdhcp

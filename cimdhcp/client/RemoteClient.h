@@ -1,0 +1,63 @@
+#pragma once
+
+#include <memory>
+#include <string>
+#include <unordered_map>
+
+#include "cimxml/OperationRequest.h"
+#include "cimxml/OperationResponse.h"
+#include "client/Client.h"
+#include "client/HttpConnection.h"
+
+namespace cimdhcp {
+
+/// A WBEM server, asked with CIM-XML over HTTP (DSP0200, DSP0201). A server that cannot
+/// be asked, or whose answer cannot be understood, is a Failure with
+/// ExitStatus::notLoaded, which does not name the server.
+class RemoteClient : public Client {
+  public:
+    RemoteClient(const ServerUrl& url, HttpSettings settings, const Deadline& deadline,
+                 std::string nameSpace);
+
+    /// Each class is asked for once, when it is first needed.
+    [[nodiscard]] ClassLookup classes() override;
+    /// The classes that no other class derives from, without those of the standard's own
+    /// schema: an implementation serves classes with a name of its own. Which provider
+    /// serves them is not known.
+    [[nodiscard]] std::vector<ClassEntry> servedClasses() override;
+    /// Always true: only the answer tells.
+    [[nodiscard]] bool mayServe(std::string_view className) const override;
+    /// What the interfaces' settings and IP endpoints tell.
+    [[nodiscard]] MachineInterfaces interfaces(const ServedInstances& served) override;
+    [[nodiscard]] std::optional<std::string> dataDir() const override;
+
+    Answer enumerateNames(const cimom::ObjectPath& path) override;
+    Answer enumerate(const cimom::ObjectPath& path) override;
+    Answer get(const cimom::ObjectPath& path) override;
+    Answer modify(const cimom::Instance& instance) override;
+    Answer associatorNames(const cimom::ObjectPath& path,
+                           const cimom::AssociationRequest& request) override;
+    Answer associators(const cimom::ObjectPath& path,
+                       const cimom::AssociationRequest& request) override;
+    Answer referenceNames(const cimom::ObjectPath& path,
+                          const cimom::AssociationRequest& request) override;
+    Answer references(const cimom::ObjectPath& path,
+                      const cimom::AssociationRequest& request) override;
+
+    [[nodiscard]] Failure failure(const Answer& answer,
+                                  const cimom::ObjectPath& asked) const override;
+
+  private:
+    cimom::wbem::OperationResponse ask(const cimom::wbem::OperationRequest& request);
+    template <typename Read>
+    Answer answerTo(const cimom::wbem::OperationRequest& request, const Read& read);
+    Answer pathsOf(const cimom::wbem::OperationRequest& request);
+    Answer instancesOf(const cimom::wbem::OperationRequest& request);
+    const cimom::ClassDeclaration* findClass(std::string_view className);
+
+    HttpConnection connection_;
+    /// By the name that was asked for; null: the server does not know the class.
+    std::unordered_map<std::string, std::unique_ptr<const cimom::ClassDeclaration>> classes_;
+};
+
+}  // namespace cimdhcp

@@ -1,0 +1,332 @@
+#include "commands/Check.h"
+
+#include <unistd.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <cstdlib>
+#include <cstring>
+#include <optional>
+#include <sstream>
+#include <utility>
+#include <variant>
+
+#include "arguments/PlatformSetup.h"
+#include "client/EmbeddedClient.h"
+#include "client/Failure.h"
+#include "commands/HiddenClients.h"
+#include "text/DisplayText.h"
+#include "zrclient/InstrumentationService.h"
+#include "zrcommon/PlatformSettings.h"
+
+namespace cimdhcp {
+
+namespace {
+
+namespace fs = std::filesystem;
+using Verdict = Finding::Verdict;
+using ZR::NodeLexicon::NodeType;
+using ZR::NodeLexicon::Properties;
+
+/// What was found, part after part.
+class Examination {
+  public:
+    Examination(const Options& options, const std::vector<Directories>& installations)
+        : options_(options), installations_(installations) {}
+
+    std::vector<Finding> examine() {
+        const bool machine = lookAtSettings();
+        lookAtDataDirectory();
+        if (machine) {
+            lookAtMachine();
+        }
+        if (const auto directories = lookAtInstallation()) {
+            if (openClient(*directories)) {
+                lookAtLibraries(*directories);
+                lookAtClasses();
+            }
+        }
+        return std::move(findings_);
+    }
+
+  private:
+    void add(Verdict verdict, std::string what, std::string detail, std::string remedy = "") {
+        findings_.push_back({verdict, std::move(what), std::move(detail), std::move(remedy)});
+    }
+
+    /// False when the tree cannot be read: there is no machine to look at then.
+    bool lookAtSettings() {
+        std::ostringstream warnings;
+        std::optional<Failure> failure;
+        try {
+            setUpPlatform(options_, warnings);
+        } catch (const Failure& error) {
+            failure = error;
+        }
+        const ZR::PlatformSettings& settings = ZR::PlatformSettings::process();
+        const char* const named = std::getenv("ZR_CONFIG");
+        const std::string file = named == nullptr ? "/etc/zr/platform.conf" : named;
+        for (const std::string& complaint : settings.complaints) {
+            add(Verdict::bad, "settings", printable(complaint),
+                "correct it; docs/settings.md lists the settings");
+        }
+        if (settings.complaints.empty()) {
+            std::error_code error;
+            const bool there = fs::exists(file, error);
+            add(Verdict::good, "settings",
+                there ? file + " is read" : "no " + file + ": every setting has its default");
+        }
+        if (failure) {
+            add(Verdict::bad, "tree", failure->what(),
+                "name another file with --tree or INSTRUMENTATION_TREE, or none for the live "
+                "machine");
+        }
+        return !failure;
+    }
+
+    void lookAtDataDirectory() {
+        const std::string& directory = ZR::PlatformSettings::process().dataDir;
+        std::error_code error;
+        if (!fs::is_directory(directory, error)) {
+            add(Verdict::notable, "data directory",
+                directory + " does not exist: no configuration has a name, and none can be given",
+                "mkdir -p " + directory + ", or set DATA_DIR");
+            return;
+        }
+        std::size_t files = 0;
+        for (fs::directory_iterator entry(directory, error); !error && entry != end(entry);
+             entry.increment(error)) {
+            if (entry->path().filename().string().starts_with("ifcfg-")) {
+                ++files;
+            }
+        }
+        if (error) {
+            add(Verdict::bad, "data directory", directory + ": " + error.message(),
+                "let this user read it, or run as another one");
+            return;
+        }
+        const bool writable = ::access(directory.c_str(), W_OK) == 0;
+        add(Verdict::good, "data directory",
+            directory + " has " + counted(files, "ifcfg file", "ifcfg files") +
+                (writable ? "" : "; this user may not write there, and so not rename"));
+    }
+
+    void lookAtMachine() {
+        const std::string& tree = ZR::PlatformSettings::process().instrumentationTree;
+        if (tree.empty()) {
+            lookAtLiveSources();
+        }
+        const auto snapshot = ZR::InstrumentationService::process().current();
+        std::size_t interfaces = 0;
+        for (auto node = snapshot->first(NodeType::NetworkInterface); node != ZR::Snapshot::none;
+             node = snapshot->node(node).nextOfType) {
+            ++interfaces;
+            const auto* const property = snapshot->find(node, Properties::DHCPEnabled);
+            const bool* const enabled =
+                property == nullptr ? nullptr : std::get_if<bool>(&property->value);
+            if (enabled != nullptr && *enabled) {
+                ++dhcpInterfaces_;
+            }
+        }
+        const std::string where = tree.empty() ? "the live machine" : "tree " + tree;
+        const std::string detail = where + " has " +
+                                   counted(interfaces, "interface", "interfaces") + ", " +
+                                   std::to_string(dhcpInterfaces_) + " of them with DHCP";
+        if (dhcpInterfaces_ > 0) {
+            add(Verdict::good, "machine", detail);
+        } else {
+            add(Verdict::notable, "machine", detail + ": the DHCP classes are empty",
+                "\"cimdhcp tree\" shows what is seen; a DHCP client has to run and to have a live "
+                "lease");
+        }
+    }
+
+    /// State files of DHCP clients that are there and that this user may not read.
+    void lookAtLiveSources() {
+        for (const char* directory : {"/run/systemd/netif/links", "/run/systemd/netif/leases",
+                                      "/var/lib/dhcp", "/var/lib/dhclient"}) {
+            std::error_code error;
+            if (!fs::is_directory(directory, error)) {
+                continue;
+            }
+            bool readable = ::access(directory, R_OK | X_OK) == 0;
+            for (fs::directory_iterator entry(directory, error); !error && entry != end(entry);
+                 entry.increment(error)) {
+                readable = readable && ::access(entry->path().c_str(), R_OK) == 0;
+            }
+            if (readable && !error) {
+                add(Verdict::good, "live source", std::string(directory) + " can be read");
+            } else {
+                add(Verdict::notable, "live source",
+                    std::string(directory) + " cannot be read whole by this user",
+                    "run as root, or add the user to the group that may read it");
+            }
+        }
+        lookAtClients();
+    }
+
+    /// Processes of DHCP clients that this user may not look into.
+    void lookAtClients() {
+        const HiddenClients hidden = findHiddenClients();
+        if (hidden.otherUsersHidden) {
+            add(Verdict::notable, "live source",
+                "/proc hides the processes of other users: DHCP clients among them are not seen",
+                "run as root, or add the user to the group that /proc is mounted for (gid=)");
+        }
+        for (const std::string& process : hidden.processes) {
+            add(Verdict::notable, "live source",
+                "the network of " + printable(process) +
+                    " is hidden from this user: what it does is not seen",
+                "run as root, or with CAP_SYS_PTRACE; for the service see docs/server.md");
+        }
+    }
+
+    std::optional<Directories> lookAtInstallation() {
+        try {
+            Directories directories = findDirectories(options_, installations_);
+            // Throws what is wrong with the registrations' directory.
+            const auto files = registrationFiles(directories.registrations);
+            add(Verdict::good, "installation",
+                "schema in " + directories.schema.string() + ", " +
+                    counted(files.size(), "registration file", "registration files") + " in " +
+                    directories.registrations.string());
+            return directories;
+        } catch (const Failure& failure) {
+            add(Verdict::bad, "installation", failure.what(),
+                "install again, or name the directories by options (cimdhcp --help)");
+            return std::nullopt;
+        }
+    }
+
+    bool openClient(const Directories& directories) {
+        try {
+            client_.emplace(directories, options_.nameSpace);
+        } catch (const Failure& failure) {
+            add(Verdict::bad, "schema and registration", failure.what(),
+                "correct the file at that place, or install again");
+            return false;
+        }
+        add(Verdict::good, "schema",
+            counted(client_->repository().classes().size(), "class", "classes"));
+        const auto& registrations = client_->registrations();
+        const auto elsewhere = std::count_if(
+            registrations.begin(), registrations.end(), [this](const cimom::Registration& each) {
+                return std::find(each.nameSpaces.begin(), each.nameSpaces.end(),
+                                 options_.nameSpace) == each.nameSpaces.end();
+            });
+        if (std::cmp_equal(elsewhere, registrations.size())) {
+            add(Verdict::bad, "registration", "no class is served in " + options_.nameSpace,
+                "name the namespace of the registration files with --namespace");
+        } else {
+            add(Verdict::good, "registration",
+                counted(registrations.size(), "class is served", "classes are served"));
+        }
+        return true;
+    }
+
+    void lookAtLibraries(const Directories& directories) {
+        std::vector<std::string> seen;
+        for (const cimom::Registration& registration : client_->registrations()) {
+            if (std::find(seen.begin(), seen.end(), registration.location) != seen.end()) {
+                continue;
+            }
+            seen.push_back(registration.location);
+            lookAtLibrary(registration.location, directories);
+        }
+    }
+
+    void lookAtLibrary(const std::string& location, const Directories& directories) {
+        const std::string name = "lib" + location + ".so";
+        for (const fs::path& directory : directories.providers) {
+            std::error_code error;
+            if (fs::exists(directory / name, error)) {
+                add(Verdict::good, "library", (directory / name).string());
+                lookAtFactories(location);
+                return;
+            }
+        }
+        std::string searched;
+        for (const fs::path& directory : directories.providers) {
+            searched += (searched.empty() ? "" : ", ") + directory.string();
+        }
+        add(Verdict::bad, "library", name + " is not in " + searched,
+            "install the provider, or name its directory with --provider-dir");
+    }
+
+    /// Calls that need the one and the other factory.
+    void lookAtFactories(const std::string& location) {
+        const cimom::Registration* instance = nullptr;
+        const cimom::Registration* association = nullptr;
+        for (const cimom::Registration& each : client_->registrations()) {
+            if (each.location == location && !each.nameSpaces.empty()) {
+                instance = instance == nullptr && each.instance ? &each : instance;
+                association = association == nullptr && each.association ? &each : association;
+            }
+        }
+        if (instance != nullptr) {
+            reportFactory("instance factory", *instance,
+                          client_->enumerateNames(pathOf(*instance)).status);
+        }
+        if (association != nullptr) {
+            cimom::AssociationRequest request;
+            request.resultClass = association->className;
+            reportFactory("association factory", *association,
+                          client_->referenceNames(pathOf(*association), request).status);
+        }
+    }
+
+    void reportFactory(const char* what, const cimom::Registration& registration,
+                       const cimom::Status& status) {
+        if (status.noProvider) {
+            add(Verdict::bad, what, printable(status.message),
+                "ldd shows libraries that are missing; else install the provider again");
+        } else {
+            add(Verdict::good, what, "of provider " + registration.provider);
+        }
+    }
+
+    static cimom::ObjectPath pathOf(const cimom::Registration& registration) {
+        return {"", registration.nameSpaces.front(), registration.className, {}};
+    }
+
+    void lookAtClasses() {
+        for (const cimom::Registration& registration : client_->registrations()) {
+            if (!registration.instance || registration.nameSpaces.empty()) {
+                continue;
+            }
+            const Answer answer = client_->enumerate(pathOf(registration));
+            if (!answer.status.ok()) {
+                add(Verdict::bad, registration.className,
+                    std::string(cimom::statusName(answer.status.code)) +
+                        (answer.status.message.empty() ? ""
+                                                       : ": " + printable(answer.status.message)),
+                    "every step is in the log with ZR_LOG_SINK=stderr ZR_LOG_LEVEL=3000 cimdhcp "
+                    "instances " +
+                        registration.className);
+            } else if (answer.instances.empty()) {
+                add(Verdict::notable, registration.className, "no instance",
+                    dhcpInterfaces_ == 0 ? "see \"machine\" above"
+                                         : "nothing of this kind is on the machine now; the log "
+                                           "tells every step with ZR_LOG_SINK=stderr "
+                                           "ZR_LOG_LEVEL=3000");
+            } else {
+                add(Verdict::good, registration.className,
+                    counted(answer.instances.size(), "instance", "instances"));
+            }
+        }
+    }
+
+    const Options& options_;
+    const std::vector<Directories>& installations_;
+    std::vector<Finding> findings_;
+    std::optional<EmbeddedClient> client_;
+    std::size_t dhcpInterfaces_ = 0;
+};
+
+}  // namespace
+
+std::vector<Finding> check(const Options& options, const std::vector<Directories>& installations) {
+    return Examination(options, installations).examine();
+}
+
+}  // namespace cimdhcp

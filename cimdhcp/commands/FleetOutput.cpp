@@ -1,0 +1,106 @@
+#include "commands/FleetOutput.h"
+
+#include <algorithm>
+#include <nlohmann/json.hpp>
+#include <ostream>
+#include <sstream>
+
+#include "text/DisplayText.h"
+#include "text/Duration.h"
+
+namespace cimdhcp {
+
+namespace {
+
+using Json = nlohmann::ordered_json;
+
+/// The text with something at the beginning of each line.
+std::string prefixed(const std::string& text, const std::string& prefix) {
+    std::istringstream lines(text);
+    std::string result;
+    for (std::string line; std::getline(lines, line);) {
+        result += line.empty() ? "\n" : prefix + line + '\n';
+    }
+    return result;
+}
+
+}  // namespace
+
+FleetOutput::FleetOutput(const std::vector<ServerUrl>& servers, Presentation presentation,
+                         bool showTime, const Outputs& outputs, const Style& errorStyle)
+    : servers_(servers),
+      presentation_(std::move(presentation)),
+      showTime_(showTime),
+      outputs_(outputs),
+      errorStyle_(errorStyle),
+      progress_(outputs.err, outputs.errWidth, servers.size()) {
+    progress_.show(0, 0);
+}
+
+std::string FleetOutput::nameOf(const ServerReport& report) const {
+    return printable(servers_[report.server].given);
+}
+
+std::string FleetOutput::textOf(const ServerReport& report) const {
+    const std::string& text = report.outcome.text;
+    if (text.empty() && report.outcome.failure) {
+        return {};
+    }
+    const std::string name = nameOf(report);
+    const std::string took = showTime_ ? " (" + durationText(report.took) + ')' : std::string();
+    if (presentation_.comments) {
+        return "// " + name + took + '\n' + text;
+    }
+    if (!presentation_.style.header || presentation_.count) {
+        return prefixed(text, name + '\t' + (showTime_ ? durationText(report.took) + '\t' : ""));
+    }
+    return presentation_.style.strong("== " + name) + took + '\n' + text + '\n';
+}
+
+std::string FleetOutput::jsonOf(const ServerReport& report) const {
+    const auto& failure = report.outcome.failure;
+    Json status{{"exit", failure ? static_cast<int>(failure->status()) : 0},
+                {"message", failure ? Json(failure->what()) : Json(nullptr)}};
+    Json object{{"host", servers_[report.server].given}, {"status", std::move(status)}};
+    if (showTime_) {
+        object["seconds"] = report.took.count();
+    }
+    object["result"] =
+        report.outcome.text.empty() ? Json(nullptr) : Json::parse(report.outcome.text);
+    return object.dump(-1, ' ', false, Json::error_handler_t::replace) + '\n';
+}
+
+void FleetOutput::show(ServerReport&& report) {
+    progress_.hide();
+    ++arrived_;
+    outputs_.out << (presentation_.json() ? jsonOf(report) : textOf(report)) << std::flush;
+    if (!report.outcome.remarks.empty()) {
+        outputs_.err << nameOf(report) << ": " << report.outcome.remarks;
+    }
+    if (report.outcome.failure) {
+        failures_.emplace_back(report.server, report.outcome.failure->what());
+    }
+    progress_.show(arrived_, failures_.size());
+}
+
+ExitStatus FleetOutput::finish(bool interrupted) {
+    progress_.hide();
+    std::sort(failures_.begin(), failures_.end());
+    const std::string total = std::to_string(servers_.size());
+    if (!failures_.empty()) {
+        outputs_.err << errorStyle_.alarming("cimdhcp:") << ' ' << failures_.size() << " of "
+                     << total << " servers failed:\n";
+        for (const auto& [server, message] : failures_) {
+            outputs_.err << "  " << printable(servers_[server].given) << ": " << message << '\n';
+        }
+    }
+    if (interrupted) {
+        outputs_.err << errorStyle_.alarming("cimdhcp:") << " interrupted; "
+                     << servers_.size() - arrived_ << " of " << total
+                     << " servers were not asked\n";
+        return ExitStatus::interrupted;
+    }
+    return failures_.empty() ? ExitStatus::ok : ExitStatus::notAllDone;
+}
+
+}  // namespace cimdhcp

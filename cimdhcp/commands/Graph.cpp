@@ -1,0 +1,180 @@
+#include "commands/Graph.h"
+
+#include <algorithm>
+#include <array>
+#include <memory>
+#include <optional>
+#include <string_view>
+#include <utility>
+
+#include "client/ClassList.h"
+#include "text/DisplayText.h"
+
+namespace cimdhcp {
+
+namespace {
+
+/// What every served class name begins with: no news in a picture.
+constexpr std::string_view schemaPrefix = "QVXZR_";
+
+/// The references from which an arrow goes out.
+constexpr std::array<std::string_view, 3> tails{"Antecedent", "ManagedElement", "GroupComponent"};
+
+/// One color for each kind of thing, light enough for black letters.
+struct Fill {
+    std::string_view classPart;  ///< stands in the class name
+    std::string_view color;
+};
+constexpr std::array<Fill, 6> fills{{{"ComputerSystem", "#cfd8dc"},
+                                     {"DHCPProtocolEndpoint", "#a5d6a7"},
+                                     {"IPProtocolEndpoint", "#c5e1a5"},
+                                     {"ServiceAccessPoint", "#ffcc80"},
+                                     {"Capabilities", "#b39ddb"},
+                                     {"SettingData", "#90caf9"}}};
+
+bool agrees(const cimom::ObjectPath& element, const cimom::ObjectPath& reference) {
+    return cimom::sameName(element.className, reference.className) &&
+           std::all_of(reference.keys.begin(), reference.keys.end(),
+                       [&element](const cimom::NamedValue& key) {
+                           const cimom::Value* const value = element.key(key.name);
+                           return value != nullptr && *value == key.value;
+                       });
+}
+
+std::size_t nodeOf(const cimom::ObjectPath& reference, std::vector<GraphNode>& nodes) {
+    const auto found = std::find_if(nodes.begin(), nodes.end(), [&reference](const auto& node) {
+        return agrees(node.path, reference);
+    });
+    if (found == nodes.end()) {
+        nodes.push_back({reference, false});
+        return nodes.size() - 1;
+    }
+    return static_cast<std::size_t>(found - nodes.begin());
+}
+
+bool isTail(const cimom::NamedValue& key) {
+    return std::any_of(tails.begin(), tails.end(),
+                       [&key](std::string_view name) { return cimom::sameName(key.name, name); });
+}
+
+const cimom::ObjectPath* referenceIn(const cimom::NamedValue& key) {
+    const cimom::Scalar* const scalar = key.value.scalar();
+    const auto* const path =
+        scalar == nullptr ? nullptr : std::get_if<std::shared_ptr<const cimom::ObjectPath>>(scalar);
+    return path == nullptr ? nullptr : path->get();
+}
+
+std::string_view shortName(std::string_view className) {
+    return className.starts_with(schemaPrefix) ? className.substr(schemaPrefix.size()) : className;
+}
+
+/// A text as it stands between double quotes in Graphviz' language. Labels know
+/// escapes of their own behind a backslash, which must not come from a name.
+std::string escaped(std::string_view text) {
+    std::string result;
+    for (const char letter : printable(text)) {
+        if (letter == '"' || letter == '\\') {
+            result += '\\';
+        }
+        result += letter;
+    }
+    return result;
+}
+
+/// What tells the instance from the others of its class.
+std::string identity(const cimom::ObjectPath& path) {
+    for (const std::string_view name : {"InstanceID", "Name"}) {
+        const cimom::Value* const value = path.key(name);
+        const cimom::Scalar* const scalar = value == nullptr ? nullptr : value->scalar();
+        const auto* const text = scalar == nullptr ? nullptr : std::get_if<std::string>(scalar);
+        if (text != nullptr) {
+            return *text;
+        }
+    }
+    return {};
+}
+
+std::string label(const cimom::ObjectPath& path) {
+    // The line break is Graphviz' own escape, hence behind the escaping.
+    return '"' + escaped(identity(path)) + "\\n" + escaped(shortName(path.className)) + '"';
+}
+
+std::string_view fillOf(const std::string& className) {
+    const auto* const fill =
+        std::find_if(fills.begin(), fills.end(), [&className](const Fill& each) {
+            return className.find(each.classPart) != std::string::npos;
+        });
+    return fill == fills.end() ? "#ffffff" : fill->color;
+}
+
+std::vector<cimom::ObjectPath> pathsOf(Client& client, const std::string& className) {
+    const cimom::ObjectPath asked = client.classPath(className);
+    Answer answer = client.enumerateNames(asked);
+    if (!answer.status.ok()) {
+        throw client.failure(answer, asked);
+    }
+    std::vector<cimom::ObjectPath> paths;
+    for (std::optional<cimom::ObjectPath>& path : answer.paths) {
+        if (path) {
+            paths.push_back(std::move(*path));
+        }
+    }
+    return paths;
+}
+
+}  // namespace
+
+Graph connect(const std::vector<cimom::ObjectPath>& elements,
+              const std::vector<cimom::ObjectPath>& associations) {
+    Graph graph;
+    for (const cimom::ObjectPath& element : elements) {
+        graph.nodes.push_back({element, true});
+    }
+    for (const cimom::ObjectPath& association : associations) {
+        const cimom::ObjectPath* from = nullptr;
+        const cimom::ObjectPath* to = nullptr;
+        for (const cimom::NamedValue& key : association.keys) {
+            (isTail(key) ? from : to) = referenceIn(key);
+        }
+        if (from != nullptr && to != nullptr) {
+            const std::size_t tail = nodeOf(*from, graph.nodes);
+            graph.edges.push_back({association.className, tail, nodeOf(*to, graph.nodes)});
+        }
+    }
+    return graph;
+}
+
+Graph graphOfMachine(Client& client) {
+    std::vector<cimom::ObjectPath> elements;
+    std::vector<cimom::ObjectPath> associations;
+    for (const ClassEntry& entry : client.servedClasses()) {
+        std::vector<cimom::ObjectPath>& paths = entry.association ? associations : elements;
+        for (cimom::ObjectPath& path : pathsOf(client, entry.name)) {
+            paths.push_back(std::move(path));
+        }
+    }
+    return connect(elements, associations);
+}
+
+std::string graphvizText(const Graph& graph) {
+    std::string text =
+        "digraph machine {\n"
+        "  rankdir=LR;\n"
+        "  ranksep=1.2;\n"
+        "  nodesep=0.15;\n"
+        "  node [shape=box, style=\"rounded,filled\", fontname=\"Helvetica\", fontsize=11];\n"
+        "  edge [color=\"#607d8b\", fontname=\"Helvetica\", fontsize=8, fontcolor=\"#455a64\"];\n";
+    for (std::size_t index = 0; index < graph.nodes.size(); ++index) {
+        const GraphNode& node = graph.nodes[index];
+        text += "  n" + std::to_string(index) + " [label=" + label(node.path) + ", fillcolor=\"" +
+                std::string(fillOf(node.path.className)) + '"' +
+                (node.served ? "" : ", style=\"rounded,filled,dashed\"") + "];\n";
+    }
+    for (const GraphEdge& edge : graph.edges) {
+        text += "  n" + std::to_string(edge.from) + " -> n" + std::to_string(edge.to) +
+                " [label=\"" + escaped(shortName(edge.association)) + "\"];\n";
+    }
+    return text + "}\n";
+}
+
+}  // namespace cimdhcp

@@ -1,0 +1,125 @@
+#include "commands/GraphDrawing.h"
+
+#include <spawn.h>
+#include <sys/mman.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <array>
+#include <cerrno>
+#include <string_view>
+#include <system_error>
+
+#include "client/Failure.h"
+#include "zrcommon/UniqueFd.h"
+
+namespace cimdhcp {
+
+namespace {
+
+/// A file without a name. Two of them stand between the programs instead of pipes:
+/// whatever the sizes, neither program ever waits for the other to read.
+ZR::UniqueFd memoryFile(const char* name) {
+    ZR::UniqueFd file(::memfd_create(name, MFD_CLOEXEC));
+    if (!file) {
+        throw std::system_error(errno, std::generic_category(), "memfd_create");
+    }
+    return file;
+}
+
+void writeWhole(int file, std::string_view text) {
+    while (!text.empty()) {
+        const ssize_t written = ::write(file, text.data(), text.size());
+        if (written < 0 && errno != EINTR) {
+            throw std::system_error(errno, std::generic_category(), "write");
+        }
+        text.remove_prefix(written < 0 ? 0 : static_cast<std::size_t>(written));
+    }
+}
+
+std::string readWhole(int file) {
+    std::string text;
+    std::array<char, 65536> piece{};
+    for (;;) {
+        const ssize_t got = ::read(file, piece.data(), piece.size());
+        if (got < 0 && errno != EINTR) {
+            throw std::system_error(errno, std::generic_category(), "read");
+        }
+        if (got == 0) {
+            return text;
+        }
+        text.append(piece.data(), got < 0 ? 0 : static_cast<std::size_t>(got));
+    }
+}
+
+void rewind(int file) {
+    if (::lseek(file, 0, SEEK_SET) != 0) {
+        throw std::system_error(errno, std::generic_category(), "lseek");
+    }
+}
+
+/// What a new process gets for its standard input and output.
+class FileActions {
+  public:
+    FileActions(int input, int output) {
+        if (::posix_spawn_file_actions_init(&actions_) != 0) {
+            throw std::bad_alloc();
+        }
+        if (::posix_spawn_file_actions_adddup2(&actions_, input, STDIN_FILENO) != 0 ||
+            ::posix_spawn_file_actions_adddup2(&actions_, output, STDOUT_FILENO) != 0) {
+            ::posix_spawn_file_actions_destroy(&actions_);
+            throw std::bad_alloc();
+        }
+    }
+    ~FileActions() { ::posix_spawn_file_actions_destroy(&actions_); }
+    FileActions(const FileActions&) = delete;
+    FileActions& operator=(const FileActions&) = delete;
+
+    [[nodiscard]] const posix_spawn_file_actions_t* get() const noexcept { return &actions_; }
+
+  private:
+    posix_spawn_file_actions_t actions_{};
+};
+
+/// The wait status of the program when it has ended.
+int runDot(int input, int output) {
+    std::string program = "dot";
+    std::string format = "-Tsvg";
+    const std::array<char*, 3> arguments{program.data(), format.data(), nullptr};
+    const FileActions actions(input, output);
+    pid_t child = 0;
+    const int error =
+        ::posix_spawnp(&child, "dot", actions.get(), nullptr, arguments.data(), environ);
+    if (error == ENOENT) {
+        throw Failure(ExitStatus::notLoaded,
+                      "drawing needs the program \"dot\": install the package graphviz, or draw "
+                      "the output of \"cimdhcp graph\" elsewhere");
+    }
+    if (error != 0) {
+        throw std::system_error(error, std::generic_category(), "dot cannot be started");
+    }
+    int status = 0;
+    while (::waitpid(child, &status, 0) < 0) {
+        if (errno != EINTR) {
+            throw std::system_error(errno, std::generic_category(), "waitpid");
+        }
+    }
+    return status;
+}
+
+}  // namespace
+
+std::string drawSvg(const std::string& graphviz) {
+    const ZR::UniqueFd input = memoryFile("graph");
+    const ZR::UniqueFd output = memoryFile("picture");
+    writeWhole(input.get(), graphviz);
+    rewind(input.get());
+    const int status = runDot(input.get(), output.get());
+    if (!WIFEXITED(status) || WEXITSTATUS(status) != 0) {
+        throw Failure(ExitStatus::notLoaded, "the program \"dot\" failed to draw the graph");
+    }
+    rewind(output.get());
+    return readWhole(output.get());
+}
+
+}  // namespace cimdhcp

@@ -1,0 +1,176 @@
+#include "commands/Program.h"
+
+#include <chrono>
+#include <cstdlib>
+#include <exception>
+#include <memory>
+#include <ostream>
+#include <variant>
+
+#include "arguments/CommandLine.h"
+#include "arguments/Directories.h"
+#include "arguments/PlatformSetup.h"
+#include "client/EmbeddedClient.h"
+#include "client/Failure.h"
+#include "commands/Check.h"
+#include "commands/ClientCommands.h"
+#include "commands/RemoteRun.h"
+#include "commands/Serve.h"
+#include "commands/UserAdd.h"
+#include "text/Duration.h"
+#include "text/Presentation.h"
+#include "zrclient/InstrumentationService.h"
+#include "zrclient/SnapshotJson.h"
+#include "zrcommon/PlatformSettings.h"
+#include "zrlinux/LiveSource.h"
+
+namespace cimdhcp {
+
+namespace {
+
+/// How long the service processor may take.
+constexpr std::chrono::seconds patience(1);
+
+/// The service processor answers when it likes, and no request waits for it. This
+/// program ends after one request: the provider is made to ask, then a question is
+/// asked behind its own, and the answer to that one awaited.
+void awaitServiceProcessor(Client& client) {
+    if (!ZR::InstrumentationService::process().awaiting()) {
+        return;
+    }
+    static_cast<void>(client.enumerateNames(client.classPath("QVXZR_DHCPProtocolEndpoint")));
+    ZR::InstrumentationService(ZR::openLiveSource()).settle(patience);
+}
+
+std::unique_ptr<EmbeddedClient> openClient(const Options& options) {
+    auto client = std::make_unique<EmbeddedClient>(
+        findDirectories(options, installations(executableFile())), options.nameSpace);
+    awaitServiceProcessor(*client);
+    return client;
+}
+
+/// Runs one command line on this machine.
+class Execution {
+  public:
+    Execution(const CommandLine& line, const Presentation& presentation, const Outputs& outputs)
+        : line_(line), presentation_(presentation), outputs_(outputs) {}
+
+    void operator()(const TreeCommand& command) const {
+        auto& service = ZR::InstrumentationService::process();
+        if (command.explain) {
+            if (!ZR::PlatformSettings::process().instrumentationTree.empty()) {
+                throw Failure(ExitStatus::usage,
+                              "only of the live machine it is known where properties came from");
+            }
+            service.useSource(ZR::openLiveSource(ZR::Explain::Yes));
+        }
+        service.settle(patience);
+        outputs_.out << ZR::toJson(*service.current());
+    }
+
+    void operator()(const ServeCommand& command) const {
+        const auto client = openClient(line_.options);
+        serve(command, *client, outputs_.out);
+    }
+
+    void operator()(const CheckCommand& /*command*/) const {
+        const auto findings = check(line_.options, installations(executableFile()));
+        outputs_.out << (presentation_.json() ? findingsJson(findings) : findingsText(findings));
+        if (!isGood(findings)) {
+            throw Failure(ExitStatus::notDone, "something is wrong, as the list tells");
+        }
+    }
+
+    void operator()(const UserAddCommand& command) const {
+        addUser(command, outputs_.out, outputs_.err);
+    }
+
+    template <typename ClientCommand>
+    void operator()(const ClientCommand& /*command*/) const {
+        const auto client = openClient(line_.options);
+        const Outcome outcome = carryOut(line_.command, *client, presentation_);
+        outputs_.out << outcome.text;
+        outputs_.err << outcome.remarks;
+        if (outcome.failure) {
+            throw Failure(*outcome.failure);
+        }
+    }
+
+  private:
+    const CommandLine& line_;
+    const Presentation& presentation_;
+    const Outputs& outputs_;
+};
+
+Style styleFor(const Options& options, bool terminal) {
+    return {!options.noHeader,
+            wantsColor(options.color, terminal, std::getenv("NO_COLOR"), std::getenv("TERM"))};
+}
+
+Presentation presentationOf(const CommandLine& line, const Outputs& outputs) {
+    const Options& options = line.options;
+    Presentation presentation;
+    presentation.format = options.format;
+    presentation.width = outputs.width;
+    presentation.style = styleFor(options, outputs.width.has_value());
+    presentation.sort = options.sort;
+    presentation.count = options.count;
+    presentation.comments =
+        options.format == Format::mof || std::holds_alternative<GraphCommand>(line.command);
+    return presentation;
+}
+
+ExitStatus runLine(const CommandLine& line, const Outputs& outputs, const Style& errorStyle) {
+    const Presentation presentation = presentationOf(line, outputs);
+    if (line.options.remote()) {
+        return runRemotely(line, presentation, outputs, errorStyle);
+    }
+    // Who may use the server has nothing to do with the machine; the check does this
+    // itself, and goes on when it fails.
+    if (!std::holds_alternative<UserAddCommand>(line.command) &&
+        !std::holds_alternative<CheckCommand>(line.command)) {
+        setUpPlatform(line.options, outputs.err);
+    }
+    std::visit(Execution(line, presentation, outputs), line.command);
+    return ExitStatus::ok;
+}
+
+}  // namespace
+
+int run(const std::vector<std::string>& arguments, const Outputs& outputs) noexcept {
+    ExitStatus status = ExitStatus::ok;
+    Style errorStyle;
+    const auto complain = [&](ExitStatus reason, const char* message) {
+        status = reason;
+        outputs.err << errorStyle.alarming("cimdhcp:") << ' ' << message << '\n';
+    };
+    const auto start = std::chrono::steady_clock::now();
+    bool time = false;
+    try {
+        ZR::serveLiveMachine();
+        const auto parsed = readCommandLine(arguments);
+        if (const auto* const information = std::get_if<Information>(&parsed)) {
+            outputs.out << information->text;
+        } else {
+            const auto& line = std::get<CommandLine>(parsed);
+            time = line.options.time;
+            errorStyle = styleFor(line.options, outputs.errWidth.has_value());
+            status = runLine(line, outputs, errorStyle);
+        }
+    } catch (const Failure& failure) {
+        complain(failure.status(), failure.what());
+    } catch (const std::exception& exception) {
+        complain(ExitStatus::notLoaded, exception.what());
+    }
+    // What has been printed before a failure is to come out, too.
+    if (!outputs.out.flush() && status == ExitStatus::ok) {
+        complain(ExitStatus::notLoaded, "the output cannot be written");
+    }
+    if (time) {
+        outputs.err << "cimdhcp: it took " << durationText(std::chrono::steady_clock::now() - start)
+                    << '\n';
+    }
+    return static_cast<int>(status);
+}
+
+}  // namespace cimdhcp

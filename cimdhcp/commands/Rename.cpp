@@ -1,0 +1,195 @@
+#include "commands/Rename.h"
+
+#include <nlohmann/json.hpp>
+#include <utility>
+#include <variant>
+#include <vector>
+
+#include "client/Failure.h"
+#include "commands/ConfigurationFile.h"
+#include "text/DisplayText.h"
+#include "text/JsonFormat.h"
+#include "zrcommon/File.h"
+#include "zrcommon/Strings.h"
+
+namespace cimdhcp {
+
+namespace {
+
+constexpr const char* settingClass = "QVXZR_DHCPSettingData";
+constexpr const char* nameProperty = "ConfigurationName";
+
+/// The setting of one interface.
+struct Setting {
+    cimom::ObjectPath path;
+    std::string id;             ///< "Computer%eth0"
+    std::string interfaceName;  ///< "eth0"
+};
+
+std::string textOf(const cimom::Value* value) {
+    const cimom::Scalar* const scalar = value == nullptr ? nullptr : value->scalar();
+    const auto* const text = scalar == nullptr ? nullptr : std::get_if<std::string>(scalar);
+    return text == nullptr ? std::string() : *text;
+}
+
+std::vector<Setting> settings(Client& client) {
+    const cimom::ObjectPath asked = client.classPath(settingClass);
+    const Answer answer = client.enumerateNames(asked);
+    if (!answer.status.ok()) {
+        throw client.failure(answer, asked);
+    }
+    std::vector<Setting> result;
+    for (const auto& path : answer.paths) {
+        if (!path) {
+            continue;
+        }
+        std::string id = textOf(path->key("InstanceID"));
+        // No system's name has the sign, an interface's may.
+        const std::size_t sign = id.find('%');
+        if (sign != std::string::npos) {
+            std::string interfaceName = id.substr(sign + 1);
+            result.push_back({*path, std::move(id), std::move(interfaceName)});
+        }
+    }
+    return result;
+}
+
+std::string list(const std::vector<Setting>& settings, std::string Setting::*member) {
+    std::string text;
+    for (const Setting& setting : settings) {
+        text += (text.empty() ? "" : ", ") + printable(setting.*member);
+    }
+    return text;
+}
+
+Setting find(const std::string& wanted, const std::vector<Setting>& all) {
+    std::vector<Setting> found;
+    for (const Setting& setting : all) {
+        if (setting.id == wanted) {
+            return setting;
+        }
+        if (setting.interfaceName == wanted) {
+            found.push_back(setting);
+        }
+    }
+    if (found.empty()) {
+        throw Failure(
+            ExitStatus::notDone,
+            "there is no interface \"" + printable(wanted) + "\"; " +
+                (all.empty() ? "this machine has none"
+                             : "this machine has: " + list(all, &Setting::interfaceName)));
+    }
+    if (found.size() > 1) {
+        throw Failure(ExitStatus::notDone, "there are several interfaces \"" + printable(wanted) +
+                                               "\"; name one of: " + list(found, &Setting::id));
+    }
+    return found.front();
+}
+
+std::string nameNow(const cimom::ObjectPath& path, Client& client) {
+    const Answer answer = client.get(path);
+    if (!answer.status.ok()) {
+        throw client.failure(answer, path);
+    }
+    for (const auto& instance : answer.instances) {
+        if (instance) {
+            return textOf(instance->property(nameProperty));
+        }
+    }
+    return {};
+}
+
+void prepareFile(const RenameCommand& command, RenameReport& report) {
+    if (ZR::File::exists(ZR::make_wstring(report.file))) {
+        return;
+    }
+    if (!command.create) {
+        throw Failure(ExitStatus::notDone, report.interfaceName +
+                                               " has no configuration file: there is no " +
+                                               printable(report.file) + "; --create makes it");
+    }
+    report.directoryCreated = createDataDirectory(report.dataDir);
+    createConfigurationFile(report.file, report.interfaceName, command.name);
+    report.fileCreated = true;
+}
+
+std::string fileOf(const Setting& setting, const std::string& dataDir) {
+    auto file = configurationFilePath(dataDir, setting.interfaceName);
+    if (!file) {
+        throw Failure(ExitStatus::notDone, "the name \"" + printable(setting.interfaceName) +
+                                               "\" cannot be part of a file's name: such an "
+                                               "interface has no configuration file");
+    }
+    return *std::move(file);
+}
+
+}  // namespace
+
+RenameReport rename(const RenameCommand& command, Client& client) {
+    if (!canBeConfigurationName(command.name)) {
+        throw Failure(ExitStatus::usage,
+                      "\"" + printable(command.name) +
+                          "\" cannot be a configuration name: it must be one line, without blanks "
+                          "at its ends or quotation marks around it");
+    }
+    const Setting setting = find(command.interfaceName, settings(client));
+    RenameReport report;
+    report.interfaceName = setting.interfaceName;
+    report.newName = command.name;
+    if (const auto dataDir = client.dataDir()) {
+        report.dataDir = *dataDir;
+        report.file = fileOf(setting, *dataDir);
+    }
+    report.oldName = nameNow(setting.path, client);
+    if (!report.file.empty()) {
+        prepareFile(command, report);
+    }
+
+    const cimom::Instance wanted{setting.path,
+                                 {{nameProperty, cimom::Value::ofString(command.name)}}};
+    const Answer answer = client.modify(wanted);
+    if (!answer.status.ok()) {
+        throw client.failure(answer, setting.path);
+    }
+    const std::string name = nameNow(setting.path, client);
+    if (name != command.name) {
+        throw Failure(ExitStatus::notDone,
+                      "the configuration name of " + printable(report.interfaceName) +
+                          " is still \"" + printable(name) + "\": " +
+                          (report.file.empty()
+                               ? "that machine has no configuration file for it, or cannot write it"
+                               : printable(whyUnchanged(report.file))));
+    }
+    return report;
+}
+
+std::string renameText(const RenameReport& report) {
+    std::string text;
+    if (report.directoryCreated) {
+        text += "Made the directory " + printable(report.dataDir) + ".\n";
+    }
+    if (report.fileCreated) {
+        text += "Made the file " + printable(report.file) + ".\n";
+    }
+    text += printable(report.interfaceName) + ": the configuration name is now \"" +
+            printable(report.newName) + '"';
+    if (!report.oldName.empty()) {
+        text += ", was \"" + printable(report.oldName) + '"';
+    }
+    return text + (report.file.empty() ? "" : " (" + printable(report.file) + ')') + ".\n";
+}
+
+std::string renameJson(const RenameReport& report) {
+    const auto json = [](const std::string& text) {
+        return text.empty() ? nlohmann::ordered_json(nullptr) : nlohmann::ordered_json(text);
+    };
+    return jsonText({{"operation", "rename"},
+                     {"interface", report.interfaceName},
+                     {"file", json(report.file)},
+                     {"fileCreated", report.fileCreated},
+                     {"directoryCreated", report.directoryCreated},
+                     {"oldName", json(report.oldName)},
+                     {"newName", report.newName}});
+}
+
+}  // namespace cimdhcp

@@ -1,0 +1,168 @@
+#include "commands/Serve.h"
+
+#include <array>
+#include <cerrno>
+#include <charconv>
+#include <chrono>
+#include <condition_variable>
+#include <csignal>
+#include <cstdlib>
+#include <cstring>
+#include <mutex>
+#include <optional>
+#include <system_error>
+#include <thread>
+
+#include "client/Failure.h"
+#include "text/DisplayText.h"
+#include "tklogger/TKLogger.h"
+#include "wbem/Server.h"
+#include "zrcommon/File.h"
+
+namespace cimdhcp {
+
+namespace {
+
+std::string pemText(const std::string& file) {
+    constexpr std::size_t longest = 1U << 20U;
+    auto content = ZR::File::read(file, longest);
+    if (!content) {
+        throw Failure(ExitStatus::notLoaded, file + ": " + std::strerror(errno));
+    }
+    return *std::move(content);
+}
+
+cimom::wbem::ServerSettings settingsOf(const ServeCommand& command) {
+    const Listening listening = readListening(command.listen);
+    cimom::wbem::ServerSettings settings;
+    settings.address = listening.address;
+    settings.port = listening.port;
+    settings.readOnly = command.readOnly;
+    settings.limits = command.limits;
+    if (command.tlsCertificate.has_value() != command.tlsKey.has_value()) {
+        throw Failure(ExitStatus::usage, "--tls-cert and --tls-key belong together");
+    }
+    if (command.tlsCertificate) {
+        settings.tls.emplace(cimom::wbem::ServerSettings::Tls{pemText(*command.tlsCertificate),
+                                                              pemText(*command.tlsKey)});
+    }
+    if (command.users) {
+        settings.users = cimom::wbem::readUsers(*command.users);
+    }
+    return settings;
+}
+
+/// What an administrator may have to know is kept by default (LOG_LEVEL 6000),
+/// what only helps to find a fault is not.
+void log(cimom::wbem::LogKind kind, const std::string& message) {
+    constexpr int important = 6000;
+    constexpr int flow = 4000;
+    static const std::string category = "ZR.WBEM";
+    TKLog::TKLogger::logLevelMessage("cimdhcp/Serve", "log", __LINE__, category,
+                                     kind == cimom::wbem::LogKind::request ? flow : important,
+                                     nullptr, 0, 0, message);
+}
+
+/// The signals that end the server, as sigwait wants them: blocked in all threads,
+/// which inherit this one's mask.
+sigset_t blockEndSignals() {
+    sigset_t signals;
+    sigemptyset(&signals);
+    sigaddset(&signals, SIGTERM);
+    sigaddset(&signals, SIGINT);
+    const int error = ::pthread_sigmask(SIG_BLOCK, &signals, nullptr);
+    if (error != 0) {
+        throw Failure(ExitStatus::notLoaded, std::strerror(error));
+    }
+    return signals;
+}
+
+/// Ends the process, without what cannot be ended, should that take too long: an
+/// operation of a provider may never return, and its thread cannot be stopped.
+class EndInTime {
+  public:
+    explicit EndInTime(std::chrono::seconds patience)
+        : thread_([this, patience] {
+              std::unique_lock lock(mutex_);
+              if (!ended_.wait_for(lock, patience, [this] { return over_; })) {
+                  log(cimom::wbem::LogKind::failure,
+                      "ending without waiting for operations that do not return");
+                  std::_Exit(static_cast<int>(ExitStatus::ok));
+              }
+          }) {}
+    ~EndInTime() {
+        {
+            const std::lock_guard lock(mutex_);
+            over_ = true;
+        }
+        ended_.notify_one();
+        thread_.join();
+    }
+    EndInTime(const EndInTime&) = delete;
+    EndInTime& operator=(const EndInTime&) = delete;
+
+  private:
+    std::mutex mutex_;
+    std::condition_variable ended_;
+    bool over_ = false;
+    std::thread thread_;
+};
+
+}  // namespace
+
+Listening readListening(const std::string& text) {
+    const auto refuse = [&text] {
+        throw Failure(ExitStatus::usage,
+                      "--listen: \"" + printable(text) + "\" is not of the form ADDRESS[:PORT]");
+    };
+    Listening listening{text, std::nullopt};
+    std::size_t colon = text.rfind(':');
+    if (text.starts_with('[')) {
+        const std::size_t bracket = text.find(']');
+        if (bracket == std::string::npos) {
+            refuse();
+        }
+        listening.address = text.substr(1, bracket - 1);
+        colon = bracket + 1 == text.size() ? std::string::npos : bracket + 1;
+        if (colon != std::string::npos && text[colon] != ':') {
+            refuse();
+        }
+    } else if (colon != text.find(':')) {
+        return listening;  // several colons: an IPv6 address without a port
+    } else {
+        listening.address = text.substr(0, colon);
+    }
+    if (colon != std::string::npos) {
+        std::uint16_t port = 0;
+        const char* const end = text.data() + text.size();
+        const auto [stop, error] = std::from_chars(text.data() + colon + 1, end, port);
+        if (error != std::errc() || stop != end) {
+            refuse();
+        }
+        listening.port = port;
+    }
+    return listening;
+}
+
+void serve(const ServeCommand& command, EmbeddedClient& client, std::ostream& out) {
+    const sigset_t signals = blockEndSignals();
+    try {
+        // Shorter than service managers wait before they kill.
+        constexpr std::chrono::seconds patience(5);
+        std::optional<EndInTime> end;
+        cimom::wbem::Server server(client.manager(), settingsOf(command), log);
+        log(cimom::wbem::LogKind::notice, "listening on " + server.url());
+        out << "Listening on " << server.url() << std::endl;
+        int signal = 0;
+        while (::sigwait(&signals, &signal) != 0) {
+        }
+        log(cimom::wbem::LogKind::notice, "ending by signal " + std::to_string(signal));
+        end.emplace(patience);
+    } catch (const cimom::wbem::ServerError& error) {
+        throw Failure(ExitStatus::notLoaded, printable(error.what()));
+    } catch (const cimom::wbem::UsersError& error) {
+        throw Failure(ExitStatus::notLoaded, printable(error.what()));
+    }
+}
+
+}  // namespace cimdhcp

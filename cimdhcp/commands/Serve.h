@@ -1,0 +1,29 @@
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <ostream>
+#include <string>
+
+#include "arguments/CommandLine.h"
+#include "client/EmbeddedClient.h"
+
+namespace cimdhcp {
+
+/// Where a server listens: "ADDRESS", "ADDRESS:PORT", "IPV6", "[IPV6]:PORT".
+struct Listening {
+    std::string address;
+    std::optional<std::uint16_t> port;
+
+    bool operator==(const Listening&) const = default;
+};
+
+/// Throws Failure with ExitStatus::usage.
+[[nodiscard]] Listening readListening(const std::string& text);
+
+/// Runs the WBEM server until the process gets SIGTERM or SIGINT, which it blocks
+/// in this thread. Prints one line when the server can be asked. What it tells goes
+/// to the logging service. Throws Failure when the server cannot start.
+void serve(const ServeCommand& command, EmbeddedClient& client, std::ostream& out);
+
+}  // namespace cimdhcp

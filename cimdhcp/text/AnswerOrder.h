@@ -1,0 +1,13 @@
+#pragma once
+
+#include <string>
+
+#include "client/Answer.h"
+
+namespace cimdhcp {
+
+/// Sorts what was answered by PATH or, instances, by one of their properties; what
+/// lacks it comes last. Throws Failure when nothing has it.
+void sortAnswer(const std::string& wanted, Answer& answer);
+
+}  // namespace cimdhcp

@@ -1,0 +1,55 @@
+#pragma once
+
+#include <algorithm>
+#include <functional>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "text/SortOrder.h"
+#include "text/Table.h"
+
+namespace cimdhcp {
+
+/// One column of a table of records.
+template <typename Row>
+struct Column {
+    std::string heading;
+    std::function<std::string(const Row&)> cell;
+};
+
+template <typename Row>
+std::vector<std::string> headingsOf(const std::vector<Column<Row>>& columns) {
+    std::vector<std::string> headings;
+    headings.reserve(columns.size());
+    for (const Column<Row>& column : columns) {
+        headings.push_back(column.heading);
+    }
+    return headings;
+}
+
+template <typename Row>
+Table tableOf(const std::vector<Column<Row>>& columns, const std::vector<Row>& rows) {
+    Table table(headingsOf(columns));
+    for (const Row& row : rows) {
+        std::vector<std::string> cells;
+        cells.reserve(columns.size());
+        for (const Column<Row>& column : columns) {
+            cells.push_back(column.cell(row));
+        }
+        table.add(cells);
+    }
+    return table;
+}
+
+/// Sorts records by what a column shows; rows that show the same keep their order.
+/// Throws Failure when there is no such column.
+template <typename Row>
+void sortBy(const std::string& wanted, const std::vector<Column<Row>>& columns,
+            std::vector<Row>& rows) {
+    const auto& cell = columns[columnNamed(wanted, headingsOf(columns))].cell;
+    std::stable_sort(rows.begin(), rows.end(),
+                     [&cell](const Row& a, const Row& b) { return comesBefore(cell(a), cell(b)); });
+}
+
+}  // namespace cimdhcp

@@ -1,0 +1,59 @@
+#include "text/ProgressBar.h"
+
+#include <algorithm>
+
+namespace cimdhcp {
+
+namespace {
+
+constexpr const char* clearLine = "\r\x1B[K";
+constexpr std::size_t longestBar = 40;
+/// Brackets and a blank.
+constexpr std::size_t aroundBar = 3;
+
+}  // namespace
+
+std::string progressText(std::size_t done, std::size_t total, std::size_t failed,
+                         std::size_t width) {
+    std::string numbers = std::to_string(done) + " of " + std::to_string(total);
+    if (failed != 0) {
+        numbers += ", " + std::to_string(failed) + " failed";
+    }
+    if (width < numbers.size() + aroundBar + 4) {
+        return numbers.substr(0, width);
+    }
+    const std::size_t length = std::min(longestBar, width - numbers.size() - aroundBar);
+    const std::size_t filled = total == 0 ? length : length * std::min(done, total) / total;
+    std::string bar(filled, '=');
+    if (filled < length) {
+        bar += '>';
+    }
+    bar.resize(length, ' ');
+    return '[' + bar + "] " + numbers;
+}
+
+ProgressBar::ProgressBar(std::ostream& terminal, std::optional<std::size_t> width,
+                         std::size_t total)
+    : terminal_(terminal), width_(width), total_(total) {}
+
+ProgressBar::~ProgressBar() {
+    hide();
+}
+
+void ProgressBar::show(std::size_t done, std::size_t failed) {
+    if (width_) {
+        // In the last column, some terminals would go on to the next line.
+        const std::size_t room = std::max<std::size_t>(*width_, 2) - 1;
+        terminal_ << clearLine << progressText(done, total_, failed, room) << std::flush;
+        shown_ = true;
+    }
+}
+
+void ProgressBar::hide() {
+    if (shown_) {
+        terminal_ << clearLine << std::flush;
+        shown_ = false;
+    }
+}
+
+}  // namespace cimdhcp

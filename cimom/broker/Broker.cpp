@@ -1,0 +1,69 @@
+#include "broker/Broker.h"
+
+#include "broker/BrokerEncapsulation.h"
+#include "broker/BrokerThreads.h"
+#include "broker/RequestScope.h"
+#include "broker/objects/BrokerContext.h"
+
+namespace cimom::broker {
+
+Broker::Broker(const Schema& schema, ObjectManager* manager) noexcept
+    : schema_(&schema),
+      manager_(manager),
+      record_{this, &brokerTable, &encapsulationTable, &threadTable, &memoryTable} {}
+
+Broker::~Broker() = default;
+
+Broker* Broker::of(const CMPIBroker* record) noexcept {
+    return record != nullptr && record->bft == &brokerTable ? static_cast<Broker*>(record->hdl)
+                                                            : nullptr;
+}
+
+void Broker::Released::operator()(CMPIContext* context) const noexcept {
+    context->ft->release(context);
+}
+
+CMPIContext* Broker::prepareThread(const CMPIContext* context) {
+    const ContextRecord* const record = contextOf(context);
+    if (record == nullptr) {
+        return nullptr;
+    }
+    std::unique_ptr<CMPIContext, Released> copy(record->ft->clone(record, nullptr));
+    if (!copy) {
+        return nullptr;
+    }
+    CMPIContext* const prepared = copy.get();
+    const std::lock_guard lock(mutex_);
+    prepared_.emplace(prepared, Prepared{std::move(copy), record->depth, 0});
+    return prepared;
+}
+
+CMPIrc Broker::attachThread(const CMPIContext* context) {
+    const std::lock_guard lock(mutex_);
+    const auto found = prepared_.find(context);
+    if (found == prepared_.end()) {
+        return CMPI_RC_ERR_INVALID_HANDLE;
+    }
+    if (!RequestScope::attachThread(found->second.depth)) {
+        return CMPI_RC_ERR_FAILED;
+    }
+    ++found->second.threads;
+    return CMPI_RC_OK;
+}
+
+CMPIrc Broker::detachThread(const CMPIContext* context) {
+    const std::lock_guard lock(mutex_);
+    const auto found = prepared_.find(context);
+    if (found == prepared_.end()) {
+        return CMPI_RC_ERR_INVALID_HANDLE;
+    }
+    if (found->second.threads == 0 || !RequestScope::detachThread()) {
+        return CMPI_RC_ERR_FAILED;
+    }
+    if (--found->second.threads == 0) {
+        prepared_.erase(found);
+    }
+    return CMPI_RC_OK;
+}
+
+}  // namespace cimom::broker

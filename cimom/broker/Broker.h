@@ -1,0 +1,65 @@
+#pragma once
+
+#include <cmpift.h>
+
+#include <memory>
+#include <mutex>
+#include <unordered_map>
+
+#include "broker/BrokerMemory.h"
+#include "mof/Schema.h"
+
+namespace cimom {
+class ObjectManager;
+}
+
+namespace cimom::broker {
+
+/// The CMPI broker as one provider library sees it. Its record is what the
+/// factories get; it must live until the library's last function returned.
+/// Safe for concurrent use.
+class Broker {
+  public:
+    /// The schema must outlive the broker. Without a manager, a provider's
+    /// requests to other providers are not supported.
+    explicit Broker(const Schema& schema, ObjectManager* manager = nullptr) noexcept;
+    ~Broker();
+    Broker(const Broker&) = delete;
+    Broker& operator=(const Broker&) = delete;
+
+    [[nodiscard]] const CMPIBroker* record() const noexcept { return &record_; }
+    /// Null for a record that is none of these.
+    static Broker* of(const CMPIBroker* record) noexcept;
+
+    [[nodiscard]] const Schema& schema() const noexcept { return *schema_; }
+    [[nodiscard]] ObjectManager* manager() const noexcept { return manager_; }
+    [[nodiscard]] MemoryPool& memory() noexcept { return memory_; }
+
+    /// A copy of the context for a thread of the provider; owned by the broker
+    /// until the thread detaches. Null for a dead context.
+    CMPIContext* prepareThread(const CMPIContext* context);
+    /// Attaches the calling thread with a prepared context.
+    CMPIrc attachThread(const CMPIContext* context);
+    CMPIrc detachThread(const CMPIContext* context);
+
+  private:
+    struct Released {
+        void operator()(CMPIContext* context) const noexcept;
+    };
+    struct Prepared {
+        std::unique_ptr<CMPIContext, Released> context;
+        unsigned depth;
+        unsigned threads;
+    };
+
+    const Schema* schema_;
+    ObjectManager* manager_;
+    CMPIBroker record_;
+    MemoryPool memory_;
+    std::mutex mutex_;
+    std::unordered_map<const CMPIContext*, Prepared> prepared_;
+};
+
+extern const CMPIBrokerFT brokerTable;
+
+}  // namespace cimom::broker

@@ -1,0 +1,146 @@
+#include "broker/BrokerText.h"
+
+#include "broker/Broker.h"
+#include "broker/BrokerTypes.h"
+#include "broker/Conversion.h"
+#include "broker/objects/BrokerArgs.h"
+#include "broker/objects/BrokerArray.h"
+#include "broker/objects/BrokerContext.h"
+#include "broker/objects/BrokerDateTime.h"
+#include "broker/objects/BrokerEnumeration.h"
+#include "broker/objects/BrokerError.h"
+#include "broker/objects/BrokerInstance.h"
+#include "broker/objects/BrokerResult.h"
+#include "cimom/ObjectPathText.h"
+
+namespace cimom::broker {
+
+namespace {
+
+/// Every CMPI object begins so.
+struct AnyRecord {
+    void* hdl;
+    const void* table;
+};
+
+std::string describe(const CMPIData& data);
+
+std::string describe(const ArrayRecord& array) {
+    std::string text = "{";
+    for (CMPICount index = 0; index < array.size; ++index) {
+        text += index == 0 ? "" : ", ";
+        text += describe(array.elements[index]);
+    }
+    return text + "}";
+}
+
+std::string describe(const EntryList& entries) {
+    std::string text = " {";
+    for (const Entry& entry : entries) {
+        text += ' ';
+        text += entry.name->view();
+        text += " = " + describe(entry.data) + ";";
+    }
+    return text + " }";
+}
+
+std::string describe(const CMPIData& data) {
+    if ((data.state & CMPI_nullValue) != 0) {
+        return "NULL";
+    }
+    if (isArrayType(data.type)) {
+        return describe(*arrayOf(data.value.array));
+    }
+    switch (data.type) {
+        case CMPI_string:
+            return '"' + std::string(textOf(data.value.string)) + '"';
+        case CMPI_dateTime:
+            return '"' + std::string(dateTimeOf(data.value.dateTime)->text->view()) + '"';
+        case CMPI_ref:
+            return '"' + textOf(*pathOf(data.value.ref)) + '"';
+        case CMPI_instance:
+            return broker::describe(data.value.inst);
+        default:
+            break;
+    }
+    const Value value = toModel(data);
+    const Scalar& scalar = *value.scalar();
+    if (const auto* truth = std::get_if<bool>(&scalar)) {
+        return *truth ? "TRUE" : "FALSE";
+    }
+    if (const auto* positive = std::get_if<std::uint64_t>(&scalar)) {
+        return std::to_string(*positive);
+    }
+    if (const auto* number = std::get_if<std::int64_t>(&scalar)) {
+        return std::to_string(*number);
+    }
+    if (const auto* real = std::get_if<double>(&scalar)) {
+        return std::to_string(*real);
+    }
+    if (const auto* character = std::get_if<char16_t>(&scalar)) {
+        return std::to_string(static_cast<unsigned>(*character));
+    }
+    return {};
+}
+
+}  // namespace
+
+std::string_view kindOf(const void* object) noexcept {
+    if (object == nullptr) {
+        return {};
+    }
+    const void* const table = static_cast<const AnyRecord*>(object)->table;
+    struct Kind {
+        const void* table;
+        std::string_view name;
+    };
+    const Kind kinds[] = {
+        {&instanceTable, "CMPIInstance"}, {&objectPathTable, "CMPIObjectPath"},
+        {&stringTable, "CMPIString"},     {&arrayTable, "CMPIArray"},
+        {&dateTimeTable, "CMPIDateTime"}, {&argsTable, "CMPIArgs"},
+        {&contextTable, "CMPIContext"},   {&enumerationTable, "CMPIEnumeration"},
+        {&resultTable, "CMPIResult"},     {&errorTable, "CMPIError"},
+        {&brokerTable, "CMPIBroker"},
+    };
+    for (const Kind& kind : kinds) {
+        if (kind.table == table) {
+            return kind.name;
+        }
+    }
+    return {};
+}
+
+std::string textOf(const PathRecord& path) {
+    return cimom::toText(toModel(path));
+}
+
+std::string describe(const void* object) {
+    const std::string_view kind = kindOf(object);
+    if (kind == "CMPIObjectPath") {
+        return textOf(*pathOf(static_cast<const CMPIObjectPath*>(object)));
+    }
+    if (kind == "CMPIInstance") {
+        const InstanceRecord& instance = *instanceOf(static_cast<const CMPIInstance*>(object));
+        return "instance of " + std::string(instance.path->className->view()) +
+               describe(instance.properties);
+    }
+    if (kind == "CMPIString") {
+        return std::string(textOf(static_cast<const CMPIString*>(object)));
+    }
+    if (kind == "CMPIArray") {
+        return describe(*arrayOf(static_cast<const CMPIArray*>(object)));
+    }
+    if (kind == "CMPIDateTime") {
+        return std::string(dateTimeOf(static_cast<const CMPIDateTime*>(object))->text->view());
+    }
+    if (kind == "CMPIArgs") {
+        return "CMPIArgs" + describe(argsOf(static_cast<const CMPIArgs*>(object))->entries);
+    }
+    if (kind == "CMPIContext") {
+        return "CMPIContext" +
+               describe(contextOf(static_cast<const CMPIContext*>(object))->entries);
+    }
+    return std::string(kind);
+}
+
+}  // namespace cimom::broker

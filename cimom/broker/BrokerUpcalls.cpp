@@ -1,0 +1,332 @@
+// The broker's own table: attaching threads, and the requests that a provider
+// makes to other providers.
+#include <utility>
+
+#include "broker/Broker.h"
+#include "broker/Conversion.h"
+#include "broker/RequestScope.h"
+#include "broker/objects/BrokerContext.h"
+#include "broker/objects/BrokerEnumeration.h"
+#include "broker/objects/BrokerInstance.h"
+#include "broker/objects/BrokerObjectPath.h"
+#include "broker/objects/BrokerStatus.h"
+#include "cimom/ObjectManager.h"
+
+namespace cimom::broker {
+
+namespace {
+
+/// What this host really does: reading and traversing; properties are written by
+/// modifyInstance only, nothing is created or deleted.
+constexpr unsigned capabilities =
+    CMPI_MB_BasicRead | CMPI_MB_AssociationTraversal | CMPI_MB_OSEncapsulationSupport |
+    CMPI_MB_Supports_MemEnhancements | CMPI_MB_Supports_Extended_Error;
+
+CMPIContext* prepareAttachThread(const CMPIBroker* mb, const CMPIContext* context) {
+    return guarded<CMPIContext*>(nullptr, nullptr, [=](CMPIrc&) -> CMPIContext* {
+        Broker* const broker = Broker::of(mb);
+        return broker == nullptr ? nullptr : broker->prepareThread(context);
+    });
+}
+
+CMPIStatus attachThread(const CMPIBroker* mb, const CMPIContext* context) {
+    return guarded([=] {
+        Broker* const broker = Broker::of(mb);
+        return broker == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : broker->attachThread(context);
+    });
+}
+
+CMPIStatus detachThread(const CMPIBroker* mb, const CMPIContext* context) {
+    return guarded([=] {
+        Broker* const broker = Broker::of(mb);
+        return broker == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : broker->detachThread(context);
+    });
+}
+
+std::optional<std::vector<std::string>> listOf(const char** properties) {
+    if (properties == nullptr) {
+        return std::nullopt;
+    }
+    std::vector<std::string> names;
+    for (; *properties != nullptr; ++properties) {
+        names.emplace_back(*properties);
+    }
+    return names;
+}
+
+std::optional<std::string> textOrNone(const char* text) {
+    return text == nullptr ? std::nullopt : std::optional<std::string>(text);
+}
+
+/// Checks what every request to another provider needs, runs it and makes a
+/// CMPIStatus of its status. The request gets manager, schema and path.
+template <typename Result, typename Request>
+CMPIStatus ask(const CMPIBroker* mb, const CMPIObjectPath* op, Result& result, Request&& request) {
+    const Broker* const broker = Broker::of(mb);
+    const PathRecord* const path = pathOf(op);
+    if (broker == nullptr) {
+        return statusOf(CMPI_RC_ERR_INVALID_HANDLE);
+    }
+    if (path == nullptr) {
+        return statusOf(CMPI_RC_ERR_INVALID_PARAMETER);
+    }
+    if (broker->manager() == nullptr) {
+        return statusOf(CMPI_RC_ERR_NOT_SUPPORTED);
+    }
+    try {
+        result = std::forward<Request>(request)(*broker->manager(), toModel(*path));
+        CMPIString* const message =
+            result.status.message.empty()
+                ? nullptr
+                : makeString(RequestScope::current().arena(), result.status.message);
+        return {result.status.code, message};
+    } catch (const std::exception&) {
+        return statusOf(CMPI_RC_ERR_FAILED);
+    }
+}
+
+void write(CMPIStatus* rc, const CMPIStatus& status) noexcept {
+    if (rc != nullptr) {
+        *rc = status;
+    }
+}
+
+CMPIData elementOf(Arena& arena, const Schema* schema, const ObjectPath& path) {
+    CMPIData data{};
+    data.type = CMPI_ref;
+    data.value.ref = toRecord(arena, schema, path);
+    return data;
+}
+
+CMPIData elementOf(Arena& arena, const Schema* schema, const Instance& instance) {
+    CMPIData data{};
+    data.type = CMPI_instance;
+    data.value.inst = toRecord(arena, schema, instance);
+    return data;
+}
+
+/// The delivered items as an enumeration; absent ones are passed over.
+template <typename Item>
+CMPIEnumeration* enumerationFrom(const CMPIBroker* mb, const CMPIStatus& status, CMPIStatus* rc,
+                                 const std::vector<std::optional<Item>>& items) {
+    if (status.rc != CMPI_RC_OK) {
+        write(rc, status);
+        return nullptr;
+    }
+    return guarded<CMPIEnumeration*>(rc, nullptr, [&](CMPIrc&) -> CMPIEnumeration* {
+        Arena& arena = RequestScope::current().arena();
+        const Schema* const schema = &Broker::of(mb)->schema();
+        CMPICount count = 0;
+        for (const auto& item : items) {
+            count += item ? 1U : 0U;
+        }
+        constexpr bool paths = std::is_same_v<Item, ObjectPath>;
+        ArrayRecord* const array = makeArray(arena, count, paths ? CMPI_ref : CMPI_instance);
+        CMPICount index = 0;
+        for (const auto& item : items) {
+            if (item) {
+                array->elements[index] = elementOf(arena, schema, *item);
+                ++index;
+            }
+        }
+        return makeEnumeration(arena, array);
+    });
+}
+
+CMPIEnumeration* enumerateInstanceNames(const CMPIBroker* mb, const CMPIContext* context,
+                                        const CMPIObjectPath* op, CMPIStatus* rc) {
+    PathsResult result;
+    const CMPIStatus status =
+        ask(mb, op, result, [&](ObjectManager& manager, const ObjectPath& path) {
+            return manager.enumerateInstanceNames(path, {std::nullopt, principalOf(context)});
+        });
+    return enumerationFrom(mb, status, rc, result.paths);
+}
+
+CMPIEnumeration* enumerateInstances(const CMPIBroker* mb, const CMPIContext* context,
+                                    const CMPIObjectPath* op, const char** properties,
+                                    CMPIStatus* rc) {
+    InstancesResult result;
+    const CMPIStatus status =
+        ask(mb, op, result, [&](ObjectManager& manager, const ObjectPath& path) {
+            return manager.enumerateInstances(path, {listOf(properties), principalOf(context)});
+        });
+    return enumerationFrom(mb, status, rc, result.instances);
+}
+
+/// A result without instance is one that was not found.
+CMPIStatus askInstance(const CMPIBroker* mb, const CMPIContext* context, const CMPIObjectPath* op,
+                       std::optional<std::vector<std::string>> properties,
+                       InstancesResult& result) {
+    CMPIStatus status = ask(mb, op, result, [&](ObjectManager& manager, const ObjectPath& path) {
+        return manager.getInstance(path, {std::move(properties), principalOf(context)});
+    });
+    if (status.rc == CMPI_RC_OK && (result.instances.empty() || !result.instances.front())) {
+        status.rc = CMPI_RC_ERR_NOT_FOUND;
+    }
+    return status;
+}
+
+CMPIInstance* getInstance(const CMPIBroker* mb, const CMPIContext* context,
+                          const CMPIObjectPath* op, const char** properties, CMPIStatus* rc) {
+    InstancesResult result;
+    const CMPIStatus status = askInstance(mb, context, op, listOf(properties), result);
+    if (status.rc != CMPI_RC_OK) {
+        write(rc, status);
+        return nullptr;
+    }
+    return guarded<CMPIInstance*>(rc, nullptr, [&](CMPIrc&) {
+        return toRecord(RequestScope::current().arena(), &Broker::of(mb)->schema(),
+                        *result.instances.front());
+    });
+}
+
+CMPIData getProperty(const CMPIBroker* mb, const CMPIContext* context, const CMPIObjectPath* op,
+                     const char* name, CMPIStatus* rc) {
+    if (name == nullptr) {
+        answer(rc, CMPI_RC_ERR_INVALID_PARAMETER);
+        return missingData();
+    }
+    InstancesResult result;
+    const CMPIStatus status = askInstance(mb, context, op, std::vector<std::string>{name}, result);
+    if (status.rc != CMPI_RC_OK) {
+        write(rc, status);
+        return missingData();
+    }
+    return guarded(rc, missingData(), [&](CMPIrc& code) -> CMPIData {
+        const Schema* const schema = &Broker::of(mb)->schema();
+        const Instance& instance = *result.instances.front();
+        if (const Value* const value = instance.property(name)) {
+            return toData(RequestScope::current().arena(), schema, *value);
+        }
+        const ClassIndex* const index = schema->find(instance.path.className);
+        const PropertyDeclaration* const declared =
+            index == nullptr ? nullptr : index->property(name);
+        if (declared == nullptr) {
+            code = CMPI_RC_ERR_NO_SUCH_PROPERTY;
+            return {};
+        }
+        // A property that an instance leaves out is null.
+        return toData(RequestScope::current().arena(), schema,
+                      Value::null(declared->type, declared->isArray));
+    });
+}
+
+CMPIStatus modifyInstance(const CMPIBroker* mb, const CMPIContext* context,
+                          const CMPIObjectPath* op, const CMPIInstance* instance,
+                          const char** properties) {
+    const InstanceRecord* const record = instanceOf(instance);
+    if (record == nullptr) {
+        return statusOf(CMPI_RC_ERR_INVALID_PARAMETER);
+    }
+    InstancesResult result;
+    return ask(mb, op, result, [&](ObjectManager& manager, ObjectPath path) {
+        Instance changed = toModel(*record);
+        changed.path = std::move(path);
+        return manager.modifyInstance(changed, {listOf(properties), principalOf(context)});
+    });
+}
+
+AssociationRequest associationRequest(const CMPIContext* context, const char* assocClass,
+                                      const char* resultClass, const char* role,
+                                      const char* resultRole, const char** properties) {
+    return {textOrNone(assocClass), textOrNone(resultClass), textOrNone(role),
+            textOrNone(resultRole), listOf(properties),      principalOf(context)};
+}
+
+CMPIEnumeration* associators(const CMPIBroker* mb, const CMPIContext* context,
+                             const CMPIObjectPath* op, const char* assocClass,
+                             const char* resultClass, const char* role, const char* resultRole,
+                             const char** properties, CMPIStatus* rc) {
+    InstancesResult result;
+    const CMPIStatus status =
+        ask(mb, op, result, [&](ObjectManager& manager, const ObjectPath& path) {
+            return manager.associators(path, associationRequest(context, assocClass, resultClass,
+                                                                role, resultRole, properties));
+        });
+    return enumerationFrom(mb, status, rc, result.instances);
+}
+
+CMPIEnumeration* associatorNames(const CMPIBroker* mb, const CMPIContext* context,
+                                 const CMPIObjectPath* op, const char* assocClass,
+                                 const char* resultClass, const char* role, const char* resultRole,
+                                 CMPIStatus* rc) {
+    PathsResult result;
+    const CMPIStatus status =
+        ask(mb, op, result, [&](ObjectManager& manager, const ObjectPath& path) {
+            return manager.associatorNames(
+                path,
+                associationRequest(context, assocClass, resultClass, role, resultRole, nullptr));
+        });
+    return enumerationFrom(mb, status, rc, result.paths);
+}
+
+CMPIEnumeration* references(const CMPIBroker* mb, const CMPIContext* context,
+                            const CMPIObjectPath* op, const char* resultClass, const char* role,
+                            const char** properties, CMPIStatus* rc) {
+    InstancesResult result;
+    const CMPIStatus status =
+        ask(mb, op, result, [&](ObjectManager& manager, const ObjectPath& path) {
+            return manager.references(
+                path, associationRequest(context, nullptr, resultClass, role, nullptr, properties));
+        });
+    return enumerationFrom(mb, status, rc, result.instances);
+}
+
+CMPIEnumeration* referenceNames(const CMPIBroker* mb, const CMPIContext* context,
+                                const CMPIObjectPath* op, const char* resultClass, const char* role,
+                                CMPIStatus* rc) {
+    PathsResult result;
+    const CMPIStatus status =
+        ask(mb, op, result, [&](ObjectManager& manager, const ObjectPath& path) {
+            return manager.referenceNames(
+                path, associationRequest(context, nullptr, resultClass, role, nullptr, nullptr));
+        });
+    return enumerationFrom(mb, status, rc, result.paths);
+}
+
+// What this host has no meaning for.
+
+CMPIStatus deliverIndication(const CMPIBroker*, const CMPIContext*, const char*,
+                             const CMPIInstance*) {
+    return statusOf(CMPI_RC_ERR_NOT_SUPPORTED);
+}
+
+CMPIObjectPath* createInstance(const CMPIBroker*, const CMPIContext*, const CMPIObjectPath*,
+                               const CMPIInstance*, CMPIStatus* rc) {
+    answer(rc, CMPI_RC_ERR_NOT_SUPPORTED);
+    return nullptr;
+}
+
+CMPIStatus deleteInstance(const CMPIBroker*, const CMPIContext*, const CMPIObjectPath*) {
+    return statusOf(CMPI_RC_ERR_NOT_SUPPORTED);
+}
+
+CMPIEnumeration* execQuery(const CMPIBroker*, const CMPIContext*, const CMPIObjectPath*,
+                           const char*, const char*, CMPIStatus* rc) {
+    answer(rc, CMPI_RC_ERR_NOT_SUPPORTED);
+    return nullptr;
+}
+
+CMPIData invokeMethod(const CMPIBroker*, const CMPIContext*, const CMPIObjectPath*, const char*,
+                      const CMPIArgs*, CMPIArgs*, CMPIStatus* rc) {
+    answer(rc, CMPI_RC_ERR_NOT_SUPPORTED);
+    return badData();
+}
+
+CMPIStatus setProperty(const CMPIBroker*, const CMPIContext*, const CMPIObjectPath*, const char*,
+                       const CMPIValue*, CMPIType) {
+    return statusOf(CMPI_RC_ERR_NOT_SUPPORTED);
+}
+
+}  // namespace
+
+const CMPIBrokerFT brokerTable{
+    capabilities, CMPIVersion200,     "cimom",           prepareAttachThread,
+    attachThread, detachThread,       deliverIndication, enumerateInstanceNames,
+    getInstance,  createInstance,     modifyInstance,    deleteInstance,
+    execQuery,    enumerateInstances, associators,       associatorNames,
+    references,   referenceNames,     invokeMethod,      setProperty,
+    getProperty};
+
+}  // namespace cimom::broker

@@ -1,0 +1,276 @@
+#include "broker/Conversion.h"
+
+#include <cmath>
+#include <limits>
+#include <string>
+#include <utility>
+
+#include "broker/BrokerTypes.h"
+#include "broker/objects/BrokerArray.h"
+#include "broker/objects/BrokerDateTime.h"
+
+namespace cimom::broker {
+
+namespace {
+
+Scalar scalarOf(const CMPIData& data) {
+    if ((data.state & CMPI_nullValue) != 0) {
+        return {};
+    }
+    switch (data.type) {
+        case CMPI_boolean:
+            return data.value.boolean != 0;
+        case CMPI_char16:
+            return static_cast<char16_t>(data.value.char16);
+        case CMPI_uint8:
+            return std::uint64_t{data.value.uint8};
+        case CMPI_uint16:
+            return std::uint64_t{data.value.uint16};
+        case CMPI_uint32:
+            return std::uint64_t{data.value.uint32};
+        case CMPI_uint64:
+            return static_cast<std::uint64_t>(data.value.uint64);
+        case CMPI_sint8:
+            return std::int64_t{data.value.sint8};
+        case CMPI_sint16:
+            return std::int64_t{data.value.sint16};
+        case CMPI_sint32:
+            return std::int64_t{data.value.sint32};
+        case CMPI_sint64:
+            return static_cast<std::int64_t>(data.value.sint64);
+        case CMPI_real32:
+            return static_cast<double>(data.value.real32);
+        case CMPI_real64:
+            return data.value.real64;
+        case CMPI_string:
+            return std::string(textOf(data.value.string));
+        case CMPI_dateTime:
+            return std::string(dateTimeOf(data.value.dateTime)->text->view());
+        case CMPI_ref:
+            return std::make_shared<const ObjectPath>(toModel(*pathOf(data.value.ref)));
+        case CMPI_instance:
+            return std::make_shared<const Instance>(toModel(*instanceOf(data.value.inst)));
+        default:
+            return {};
+    }
+}
+
+[[noreturn]] void refuse(const std::string& what, Type type) {
+    throw ConversionError(what + " is no " + std::string(typeName(type)));
+}
+
+template <typename Target>
+Target integer(const Scalar& scalar, Type type) {
+    if (const auto* positive = std::get_if<std::uint64_t>(&scalar)) {
+        if (std::in_range<Target>(*positive)) {
+            return static_cast<Target>(*positive);
+        }
+        refuse(std::to_string(*positive), type);
+    }
+    if (const auto* number = std::get_if<std::int64_t>(&scalar)) {
+        if (std::in_range<Target>(*number)) {
+            return static_cast<Target>(*number);
+        }
+        refuse(std::to_string(*number), type);
+    }
+    refuse("a value of another kind", type);
+}
+
+double real(const Scalar& scalar, Type type) {
+    if (const auto* number = std::get_if<double>(&scalar)) {
+        return *number;
+    }
+    if (const auto* positive = std::get_if<std::uint64_t>(&scalar)) {
+        return static_cast<double>(*positive);
+    }
+    if (const auto* whole = std::get_if<std::int64_t>(&scalar)) {
+        return static_cast<double>(*whole);
+    }
+    refuse("a value of another kind", type);
+}
+
+float narrowed(double number, Type type) {
+    if (std::isfinite(number) && std::abs(number) > std::numeric_limits<float>::max()) {
+        refuse(std::to_string(number), type);
+    }
+    return static_cast<float>(number);
+}
+
+template <typename Held>
+const Held& held(const Scalar& scalar, Type type) {
+    const auto* const value = std::get_if<Held>(&scalar);
+    if (value == nullptr) {
+        refuse("a value of another kind", type);
+    }
+    return *value;
+}
+
+CMPIDateTime* dateTime(Arena& arena, const std::string& text) {
+    DateTimeRecord* const record = makeDateTime(arena, std::string_view(text));
+    if (record == nullptr) {
+        refuse('"' + text + '"', Type::datetime);
+    }
+    return record;
+}
+
+CMPIData scalarData(Arena& arena, const Schema* schema, Type type, const Scalar& scalar) {
+    CMPIData data = nullData(cmpiType(type));
+    if (std::holds_alternative<std::monostate>(scalar)) {
+        return data;
+    }
+    data.state = CMPI_goodValue;
+    CMPIValue& value = data.value;
+    switch (type) {
+        case Type::boolean:
+            value.boolean = held<bool>(scalar, type) ? 1 : 0;
+            break;
+        case Type::char16:
+            value.char16 = static_cast<CMPIChar16>(held<char16_t>(scalar, type));
+            break;
+        case Type::uint8:
+            value.uint8 = integer<CMPIUint8>(scalar, type);
+            break;
+        case Type::uint16:
+            value.uint16 = integer<CMPIUint16>(scalar, type);
+            break;
+        case Type::uint32:
+            value.uint32 = integer<CMPIUint32>(scalar, type);
+            break;
+        case Type::uint64:
+            value.uint64 = integer<CMPIUint64>(scalar, type);
+            break;
+        case Type::sint8:
+            value.sint8 = integer<CMPISint8>(scalar, type);
+            break;
+        case Type::sint16:
+            value.sint16 = integer<CMPISint16>(scalar, type);
+            break;
+        case Type::sint32:
+            value.sint32 = integer<CMPISint32>(scalar, type);
+            break;
+        case Type::sint64:
+            value.sint64 = integer<CMPISint64>(scalar, type);
+            break;
+        case Type::real32:
+            value.real32 = narrowed(real(scalar, type), type);
+            break;
+        case Type::real64:
+            value.real64 = real(scalar, type);
+            break;
+        case Type::string:
+            // An embedded instance may stand in a text property.
+            if (const auto* instance = std::get_if<std::shared_ptr<const Instance>>(&scalar)) {
+                data.type = CMPI_instance;
+                value.inst = toRecord(arena, schema, **instance);
+            } else {
+                value.string = makeString(arena, held<std::string>(scalar, type));
+            }
+            break;
+        case Type::datetime:
+            value.dateTime = dateTime(arena, held<std::string>(scalar, type));
+            break;
+        case Type::reference:
+            value.ref =
+                toRecord(arena, schema, *held<std::shared_ptr<const ObjectPath>>(scalar, type));
+            break;
+        case Type::instance:
+            value.inst =
+                toRecord(arena, schema, *held<std::shared_ptr<const Instance>>(scalar, type));
+            break;
+    }
+    return data;
+}
+
+CMPIData namedData(Arena& arena, const Schema* schema, const NamedValue& named) {
+    try {
+        return toData(arena, schema, named.value);
+    } catch (const ConversionError& error) {
+        throw ConversionError(named.name + ": " + error.what());
+    }
+}
+
+std::vector<NamedValue> toModel(const EntryList& entries) {
+    std::vector<NamedValue> values;
+    values.reserve(entries.size());
+    for (const Entry& entry : entries) {
+        values.push_back({std::string(entry.name->view()), broker::toModel(entry.data)});
+    }
+    return values;
+}
+
+}  // namespace
+
+Value toModel(const CMPIData& data) {
+    const bool isArray = isArrayType(data.type);
+    // A null without a type, set on a property that no class declares.
+    const Type type = cimType(withoutArray(data.type)).value_or(Type::string);
+    if ((data.state & CMPI_nullValue) != 0) {
+        return Value::null(type, isArray);
+    }
+    if (!isArray) {
+        return Value{type, false, scalarOf(data)};
+    }
+    const ArrayRecord* const array = arrayOf(data.value.array);
+    Array elements;
+    elements.reserve(array->size);
+    for (CMPICount index = 0; index < array->size; ++index) {
+        elements.push_back(scalarOf(array->elements[index]));
+    }
+    return Value{type, true, std::move(elements)};
+}
+
+ObjectPath toModel(const PathRecord& path) {
+    return {std::string(path.host->view()), std::string(path.nameSpace->view()),
+            std::string(path.className->view()), toModel(path.keys)};
+}
+
+Instance toModel(const InstanceRecord& instance) {
+    return {toModel(*instance.path), toModel(instance.properties)};
+}
+
+CMPIData toData(Arena& arena, const Schema* schema, const Value& value) {
+    if (value.isNull()) {
+        return nullData(cmpiType(value.type, value.isArray));
+    }
+    if (const Scalar* const scalar = value.scalar()) {
+        return scalarData(arena, schema, value.type, *scalar);
+    }
+    const auto& elements = std::get<Array>(value.content);
+    if (elements.size() > std::numeric_limits<CMPICount>::max()) {
+        throw ConversionError("an array of that length");
+    }
+    CMPIData data{};
+    data.type = cmpiType(value.type, true);
+    ArrayRecord* const array =
+        makeArray(arena, static_cast<CMPICount>(elements.size()), cmpiType(value.type));
+    for (CMPICount index = 0; index < array->size; ++index) {
+        array->elements[index] = scalarData(arena, schema, value.type, elements[index]);
+    }
+    data.value.array = array;
+    return data;
+}
+
+PathRecord* toRecord(Arena& arena, const Schema* schema, const ObjectPath& path) {
+    PathRecord* const record = makePath(arena, schema, path.nameSpace, path.className);
+    if (!path.host.empty()) {
+        record->host = makeString(arena, path.host);
+    }
+    record->keys.reserve(arena, static_cast<CMPICount>(path.keys.size()));
+    for (const NamedValue& key : path.keys) {
+        // Keys cannot be null; a path with a null key is one without it.
+        if (!key.value.isNull()) {
+            record->keys.set(arena, key.name, namedData(arena, schema, key));
+        }
+    }
+    return record;
+}
+
+InstanceRecord* toRecord(Arena& arena, const Schema* schema, const Instance& instance) {
+    InstanceRecord* const record = makeInstance(arena, *toRecord(arena, schema, instance.path));
+    for (const NamedValue& property : instance.properties) {
+        record->properties.set(arena, property.name, namedData(arena, schema, property));
+    }
+    return record;
+}
+
+}  // namespace cimom::broker

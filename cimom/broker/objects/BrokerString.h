@@ -1,0 +1,36 @@
+#pragma once
+
+#include <cmpift.h>
+
+#include <cstddef>
+#include <string_view>
+
+#include "broker/Arena.h"
+
+namespace cimom::broker {
+
+/// A CMPIString. Its hdl is the zero-terminated text itself, because clients
+/// built with the older convenience macros read it there. Never changes.
+struct StringRecord : CMPIString {
+    Arena* arena;
+    std::size_t length;
+
+    [[nodiscard]] const char* text() const noexcept { return static_cast<const char*>(hdl); }
+    [[nodiscard]] std::string_view view() const noexcept { return {text(), length}; }
+};
+
+extern const CMPIStringFT stringTable;
+
+/// Throws std::bad_alloc.
+StringRecord* makeString(Arena& arena, std::string_view text);
+
+/// The string itself when it lives in that arena, else a copy there.
+StringRecord* stringIn(Arena& arena, const CMPIString& string);
+
+/// The record of an empty text that lives for ever.
+[[nodiscard]] StringRecord* emptyString() noexcept;
+
+/// The text of any broker's string; empty for a null or dead one.
+[[nodiscard]] std::string_view textOf(const CMPIString* string);
+
+}  // namespace cimom::broker

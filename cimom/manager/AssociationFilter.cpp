@@ -1,0 +1,78 @@
+#include "manager/AssociationFilter.h"
+
+#include <algorithm>
+#include <string_view>
+
+#include "manager/PathMatch.h"
+
+namespace cimom {
+
+namespace {
+
+struct End {
+    std::string_view role;
+    const ObjectPath* object;
+};
+
+/// The references of an association: keys first, then properties that are not keys.
+std::vector<End> endsOf(const Instance& association) {
+    std::vector<End> ends;
+    const auto add = [&ends](const NamedValue& named) {
+        const Scalar* const scalar = named.value.scalar();
+        const auto* const reference =
+            scalar == nullptr ? nullptr : std::get_if<std::shared_ptr<const ObjectPath>>(scalar);
+        const bool known = std::any_of(ends.begin(), ends.end(), [&named](const End& end) {
+            return sameName(end.role, named.name);
+        });
+        if (reference != nullptr && !known) {
+            ends.push_back({named.name, reference->get()});
+        }
+    };
+    std::for_each(association.path.keys.begin(), association.path.keys.end(), add);
+    std::for_each(association.properties.begin(), association.properties.end(), add);
+    return ends;
+}
+
+bool hasRole(const End& end, const std::optional<std::string>& role) noexcept {
+    return !role || sameName(end.role, *role);
+}
+
+}  // namespace
+
+bool isOfClass(const std::string& className, const std::optional<std::string>& wanted,
+               const ClassRepository& repository) {
+    return !wanted || sameName(className, *wanted) || repository.isA(className, *wanted);
+}
+
+bool playsRole(const Instance& association, const ObjectPath& object,
+               const std::optional<std::string>& role, const ClassRepository& repository) {
+    if (!role) {
+        return true;
+    }
+    const std::vector<End> ends = endsOf(association);
+    return std::any_of(ends.begin(), ends.end(), [&](const End& end) {
+        return hasRole(end, role) && sameObject(*end.object, object, repository);
+    });
+}
+
+bool connects(const std::vector<Instance>& associations, const ObjectPath& source,
+              const ObjectPath& other, const std::optional<std::string>& role,
+              const std::optional<std::string>& resultRole, const ClassRepository& repository) {
+    for (const Instance& association : associations) {
+        const std::vector<End> ends = endsOf(association);
+        for (const End& near : ends) {
+            if (!hasRole(near, role) || !sameObject(*near.object, source, repository)) {
+                continue;
+            }
+            for (const End& far : ends) {
+                if (&far != &near && hasRole(far, resultRole) &&
+                    sameObject(*far.object, other, repository)) {
+                    return true;
+                }
+            }
+        }
+    }
+    return false;
+}
+
+}  // namespace cimom

@@ -1,0 +1,110 @@
+#pragma once
+
+#include <cmpift.h>
+#include <cxxabi.h>
+
+#include <cstddef>
+#include <exception>
+#include <functional>
+#include <optional>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "broker/Arena.h"
+#include "broker/Conversion.h"
+#include "broker/RequestScope.h"
+#include "broker/objects/BrokerContext.h"
+#include "broker/objects/BrokerResult.h"
+#include "cimom/Cim.h"
+#include "mof/Schema.h"
+
+namespace cimom {
+
+/// The model of a provider's status; reads it while the message still lives.
+[[nodiscard]] Status statusFrom(const CMPIStatus& status);
+
+/// Runs a function of a provider; whatever it throws becomes a status that
+/// names it. The unwinding of a cancelled thread passes.
+template <typename Call>
+Status guardedCall(const std::string& who, Call&& call) {
+    try {
+        return statusFrom(std::forward<Call>(call)());
+    } catch (const abi::__forced_unwind&) {
+        throw;
+    } catch (const std::exception& exception) {
+        return {CMPI_RC_ERR_FAILED, who + " threw an exception: " + exception.what()};
+    } catch (...) {
+        return {CMPI_RC_ERR_FAILED, who + " threw an exception of an unknown kind"};
+    }
+}
+
+/// A property list as CMPI passes it: ended by a null pointer; null for none.
+class PropertyNames {
+  public:
+    explicit PropertyNames(const std::optional<std::vector<std::string>>& names);
+    [[nodiscard]] const char** pointer() noexcept {
+        return pointers_.empty() ? nullptr : pointers_.data();
+    }
+
+  private:
+    std::vector<const char*> pointers_;
+};
+
+/// Where the objects of a request's calls go.
+struct Sink {
+    broker::ResultCollector::Kind kind = broker::ResultCollector::Kind::instances;
+    broker::Consumer consumer;
+    std::function<std::size_t()> mark;
+    std::function<void(std::size_t)> backTo;  ///< as those of a Receiver
+};
+
+/// What is the same for all calls of one request.
+struct CallSettings {
+    const broker::Schema* schema;
+    std::string principal;
+    CMPIFlags flags = 0;
+};
+
+/// What came of one call, beside the objects that it delivered. After an error
+/// there are none.
+struct CallOutcome {
+    Status status;
+    unsigned returnDoneCalls = 0;
+};
+
+[[nodiscard]] CallOutcome missingSlot(const std::string& provider, const char* slot);
+
+/// The status when a request is nested too deep; OK otherwise.
+[[nodiscard]] Status checkDepth();
+
+/// The end of a call that began when the sink was at `mark`: after an error nothing
+/// counts but its message. Throws what the sink has thrown.
+[[nodiscard]] CallOutcome finished(Status status, broker::ResultCollector& collector,
+                                   const Sink& sink, std::size_t mark);
+
+/// One call of a provider's slot, with everything that it needs: memory, context,
+/// result and object path. `invoke` gets those as (context, result, path)
+/// and gives a CMPIStatus. Too deep a nesting of requests is an
+/// error status. Throws broker::ConversionError for a path that cannot be handed
+/// over, and what the sink throws.
+template <typename Invoke>
+CallOutcome callProvider(const CallSettings& settings, const Sink& sink, const std::string& who,
+                         const ObjectPath& path, Invoke&& invoke) {
+    if (Status tooDeep = checkDepth(); !tooDeep.ok()) {
+        return {std::move(tooDeep)};
+    }
+    broker::RequestScope scope;
+    broker::ResultCollector collector(sink.kind, &sink.consumer);
+    const std::size_t mark = sink.mark();
+    broker::Arena& arena = scope.arena();
+    const CMPIContext* const context =
+        broker::makeContext(arena, path.nameSpace, settings.principal, settings.flags,
+                            broker::RequestScope::depthOfThread());
+    const CMPIObjectPath* const record = broker::toRecord(arena, settings.schema, path);
+    Status status = guardedCall(
+        who, [&] { return std::forward<Invoke>(invoke)(context, collector.record(), record); });
+    return finished(std::move(status), collector, sink, mark);
+}
+
+}  // namespace cimom

@@ -1,0 +1,144 @@
+#include "mof/QualifierTypes.h"
+
+#include <algorithm>
+#include <utility>
+
+#include "mof/MofValue.h"
+
+namespace cimom {
+
+namespace {
+
+[[noreturn]] void fail(const std::string& file, MofPosition position, const std::string& reason) {
+    throw MofError(file, position.line, position.column, reason);
+}
+
+std::string_view shown(MofScope scope) {
+    switch (scope) {
+        case MofScope::classes:
+            return "a class";
+        case MofScope::association:
+            return "an association";
+        case MofScope::indication:
+            return "an indication";
+        case MofScope::property:
+            return "a property";
+        case MofScope::reference:
+            return "a reference";
+        case MofScope::method:
+            return "a method";
+        case MofScope::parameter:
+            return "a parameter";
+        default:
+            return "this element";
+    }
+}
+
+}  // namespace
+
+void QualifierTypes::add(const MofQualifierType& declaration, const std::string& file) {
+    Entry entry;
+    entry.prototype.name = declaration.name;
+    entry.prototype.value =
+        declaration.defaultValue
+            ? typedValue(*declaration.defaultValue, declaration.type, declaration.isArray, file)
+            : Value::null(declaration.type, declaration.isArray);
+    // DSP0004, 5.6.1.2: what is not said is EnableOverride and ToSubclass.
+    entry.prototype.overridable = declaration.flavors.overridable.value_or(true);
+    entry.prototype.toSubclass = declaration.flavors.toSubclass.value_or(true);
+    entry.prototype.translatable = declaration.flavors.translatable.value_or(false);
+    entry.scopes = declaration.scopes;
+    if (!entries_.emplace(declaration.name, std::move(entry)).second) {
+        fail(file, declaration.position, "qualifier " + declaration.name + " is declared twice");
+    }
+}
+
+std::vector<Qualifier> QualifierTypes::resolve(const std::vector<MofQualifier>& written,
+                                               MofScope scope, const std::string& file) const {
+    std::vector<Qualifier> result;
+    result.reserve(written.size());
+    for (const MofQualifier& qualifier : written) {
+        if (findQualifier(result, qualifier.name) != nullptr) {
+            fail(file, qualifier.position, "qualifier " + qualifier.name + " is given twice");
+        }
+        result.push_back(resolveOne(qualifier, scope, file));
+    }
+    return result;
+}
+
+Qualifier QualifierTypes::resolveOne(const MofQualifier& written, MofScope scope,
+                                     const std::string& file) const {
+    const auto found = entries_.find(std::string_view(written.name));
+    if (found == entries_.end()) {
+        fail(file, written.position, "qualifier " + written.name + " is not declared");
+    }
+    const auto& [prototype, scopes] = found->second;
+    const bool allowed = std::any_of(scopes.begin(), scopes.end(), [scope](MofScope each) {
+        return each == scope || each == MofScope::any;
+    });
+    if (!allowed) {
+        fail(file, written.position,
+             "qualifier " + written.name + " cannot stand at " + std::string(shown(scope)));
+    }
+    Qualifier result = prototype;
+    const Type type = prototype.value.type;
+    const bool isArray = prototype.value.isArray;
+    if (written.value) {
+        result.value = typedValue(*written.value, type, isArray, file);
+    } else {
+        // DSP0004, 4.5.4: a name alone means TRUE, and null for other types.
+        result.value = type == Type::boolean && !isArray ? Value{Type::boolean, false, Scalar(true)}
+                                                         : Value::null(type, isArray);
+    }
+    if (!prototype.overridable && written.flavors.overridable.value_or(false)) {
+        fail(file, written.position, "qualifier " + written.name + " cannot be made overridable");
+    }
+    result.overridable = written.flavors.overridable.value_or(prototype.overridable);
+    result.toSubclass = written.flavors.toSubclass.value_or(prototype.toSubclass);
+    result.translatable = written.flavors.translatable.value_or(prototype.translatable);
+    return result;
+}
+
+std::vector<Qualifier> inheritQualifiers(std::vector<Qualifier> own,
+                                         const std::vector<MofQualifier>& written,
+                                         const std::vector<Qualifier>& inherited,
+                                         const std::string& file) {
+    for (const Qualifier& above : inherited) {
+        if (!above.toSubclass) {
+            continue;
+        }
+        const auto here = std::find_if(own.begin(), own.end(), [&above](const Qualifier& each) {
+            return sameName(each.name, above.name);
+        });
+        if (here == own.end()) {
+            own.push_back(above);
+        } else if (!above.overridable) {
+            if (here->value != above.value) {
+                // Qualifiers appended above never repeat a name, so `here` is a written one.
+                const auto index = static_cast<std::size_t>(here - own.begin());
+                fail(file, written.at(index).position,
+                     "qualifier " + above.name + " cannot be changed in a subclass");
+            }
+            here->overridable = false;
+        }
+    }
+    return own;
+}
+
+const Qualifier* findQualifier(const std::vector<Qualifier>& qualifiers,
+                               std::string_view name) noexcept {
+    const auto found =
+        std::find_if(qualifiers.begin(), qualifiers.end(),
+                     [name](const Qualifier& each) { return sameName(each.name, name); });
+    return found == qualifiers.end() ? nullptr : &*found;
+}
+
+bool isTrue(const Qualifier* qualifier) noexcept {
+    if (qualifier == nullptr || qualifier->value.scalar() == nullptr) {
+        return false;
+    }
+    const bool* const truth = std::get_if<bool>(qualifier->value.scalar());
+    return truth != nullptr && *truth;
+}
+
+}  // namespace cimom

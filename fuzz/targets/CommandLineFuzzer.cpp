@@ -1,0 +1,235 @@
+// The arguments of cimdhcp with zero bytes between. They are read, and nothing is done.
+#include "arguments/CommandLine.h"
+
+#include <algorithm>
+
+#include "Input.h"
+#include "client/Failure.h"
+#include "commands/Serve.h"
+
+namespace {
+
+using Arguments = std::vector<std::string>;
+using cimdhcp::CommandLine;
+
+void addOption(Arguments& arguments, const char* name, const std::optional<std::string>& value) {
+    if (value) {
+        arguments.push_back(std::string("--") + name + '=' + *value);
+    }
+}
+
+void addFlag(Arguments& arguments, const char* name, bool given) {
+    if (given) {
+        arguments.push_back(std::string("--") + name);
+    }
+}
+
+/// Operands, which may begin with a "-".
+void addOperands(Arguments& arguments, const Arguments& operands) {
+    arguments.emplace_back("--");
+    arguments.insert(arguments.end(), operands.begin(), operands.end());
+}
+
+/// Writes the arguments of a command behind the options that all have.
+struct Writer {
+    Arguments arguments;
+
+    void operator()(const cimdhcp::ShowCommand&) { arguments.emplace_back("show"); }
+    void operator()(const cimdhcp::ClassesCommand&) { arguments.emplace_back("classes"); }
+    void operator()(const cimdhcp::CheckCommand&) { arguments.emplace_back("check"); }
+    void operator()(const cimdhcp::RenameCommand& command) {
+        arguments.emplace_back("rename");
+        addFlag(arguments, "create", command.create);
+        addOperands(arguments, {command.interfaceName, command.name});
+    }
+    void operator()(const cimdhcp::GraphCommand& command) {
+        arguments.emplace_back("graph");
+        addFlag(arguments, "svg", command.svg);
+    }
+    void operator()(const cimdhcp::TreeCommand& command) {
+        arguments.emplace_back("tree");
+        addFlag(arguments, "explain", command.explain);
+    }
+    void operator()(const cimdhcp::NamesCommand& command) {
+        arguments.emplace_back("names");
+        addOperands(arguments, {command.className});
+    }
+    void operator()(const cimdhcp::InstancesCommand& command) {
+        arguments.emplace_back("instances");
+        addOperands(arguments, {command.className});
+    }
+    void operator()(const cimdhcp::GetCommand& command) {
+        arguments.emplace_back("get");
+        addOperands(arguments, {command.path});
+    }
+    void operator()(const cimdhcp::ModifyCommand& command) {
+        arguments.emplace_back("modify");
+        Arguments operands{command.path};
+        operands.insert(operands.end(), command.assignments.begin(), command.assignments.end());
+        addOperands(arguments, operands);
+    }
+    void operator()(const cimdhcp::AssociatorsCommand& command) {
+        arguments.emplace_back("associators");
+        addFlag(arguments, "names", command.names);
+        addOption(arguments, "assoc-class", command.assocClass);
+        addOption(arguments, "result-class", command.resultClass);
+        addOption(arguments, "role", command.role);
+        addOption(arguments, "result-role", command.resultRole);
+        addOperands(arguments, {command.path});
+    }
+    void operator()(const cimdhcp::ReferencesCommand& command) {
+        arguments.emplace_back("references");
+        addFlag(arguments, "names", command.names);
+        addOption(arguments, "result-class", command.resultClass);
+        addOption(arguments, "role", command.role);
+        addOperands(arguments, {command.path});
+    }
+    void operator()(const cimdhcp::ServeCommand& command) {
+        arguments.emplace_back("serve");
+        addOption(arguments, "listen", command.listen);
+        addOption(arguments, "tls-cert", command.tlsCertificate);
+        addOption(arguments, "tls-key", command.tlsKey);
+        addOption(arguments, "users", command.users);
+        addFlag(arguments, "read-only", command.readOnly);
+        addLimits(command.limits);
+    }
+    void operator()(const cimdhcp::UserAddCommand& command) {
+        arguments.emplace_back("user");
+        arguments.emplace_back("add");
+        addOption(arguments, "users", command.users);
+        addFlag(arguments, "modify", command.mayModify);
+        addOperands(arguments, {command.name});
+    }
+
+  private:
+    void addLimits(const cimom::wbem::Limits& limits) {
+        const auto add = [this](const char* name, auto number) {
+            addOption(arguments, name, std::to_string(number));
+        };
+        add("max-header-line", limits.headerLine);
+        add("max-headers", limits.headers);
+        add("max-body", limits.body);
+        add("max-depth", limits.depth);
+        add("max-connections", limits.connections);
+        add("max-waiting", limits.waiting);
+        add("max-enumerations", limits.sessions.sessions);
+        add("max-result", limits.result);
+        add("workers", limits.workers);
+        add("max-stuck", limits.stuck);
+        add("io-threads", limits.ioThreads);
+        add("request-timeout", limits.request.count());
+        add("answer-timeout", limits.answer.count());
+        add("enumeration-timeout", limits.sessions.defaultTimeout.count());
+        add("max-enumeration-timeout", limits.sessions.longestTimeout.count());
+    }
+};
+
+const char* nameOf(cimdhcp::Format format) {
+    return format == cimdhcp::Format::mof    ? "mof"
+           : format == cimdhcp::Format::json ? "json"
+                                             : "table";
+}
+
+const char* nameOf(cimdhcp::ColorMode mode) {
+    return mode == cimdhcp::ColorMode::always  ? "always"
+           : mode == cimdhcp::ColorMode::never ? "never"
+                                               : "auto";
+}
+
+Arguments written(const CommandLine& line) {
+    Writer writer;
+    addOption(writer.arguments, "tree", line.options.tree);
+    addOption(writer.arguments, "data-dir", line.options.dataDir);
+    addOption(writer.arguments, "namespace", line.options.nameSpace);
+    addOption(writer.arguments, "format", nameOf(line.options.format));
+    addOption(writer.arguments, "schema-dir", line.options.schemaDir);
+    addOption(writer.arguments, "registration-dir", line.options.registrationDir);
+    addOption(writer.arguments, "provider-dir", line.options.providerDir);
+    for (const std::string& server : line.options.connect) {
+        addOption(writer.arguments, "connect", server);
+    }
+    addOption(writer.arguments, "hosts", line.options.hosts);
+    addOption(writer.arguments, "parallel", std::to_string(line.options.parallel));
+    addOption(writer.arguments, "timeout", std::to_string(line.options.timeout.count()));
+    addOption(writer.arguments, "cacert", line.options.caCertificate);
+    addFlag(writer.arguments, "insecure", line.options.insecure);
+    addOption(writer.arguments, "credentials", line.options.credentials);
+    addFlag(writer.arguments, "no-header", line.options.noHeader);
+    addOption(writer.arguments, "sort", line.options.sort);
+    addFlag(writer.arguments, "count", line.options.count);
+    addFlag(writer.arguments, "time", line.options.time);
+    addOption(writer.arguments, "color", nameOf(line.options.color));
+    std::visit(writer, line.command);
+    return writer.arguments;
+}
+
+/// Making the parser takes a hundred times as long as reading a line. That it keeps
+/// nothing from line to line shows with each line that is read again.
+std::variant<CommandLine, cimdhcp::Information> readLine(const Arguments& arguments) {
+    static cimdhcp::CommandLineReader reader;
+    return reader.read(arguments);
+}
+
+/// What comes of a line that was read and written; no text when it is refused.
+std::variant<CommandLine, cimdhcp::Information> readAgain(const CommandLine& line) {
+    try {
+        return readLine(written(line));
+    } catch (const cimdhcp::Failure& failure) {
+        static_cast<void>(std::fprintf(stderr, "%s\n", failure.what()));
+        return cimdhcp::Information{};
+    }
+}
+
+/// The parser takes "[a,b]" for a list of two, also within such a list. No assignment
+/// begins so.
+bool hasBrackets(const CommandLine& line) {
+    const auto* const modify = std::get_if<cimdhcp::ModifyCommand>(&line.command);
+    return modify != nullptr &&
+           std::any_of(modify->assignments.begin(), modify->assignments.end(),
+                       [](const std::string& each) { return each.starts_with('['); });
+}
+
+void checkListening(const CommandLine& line) {
+    const auto* const serve = std::get_if<cimdhcp::ServeCommand>(&line.command);
+    if (serve == nullptr) {
+        return;
+    }
+    try {
+        const cimdhcp::Listening listening = cimdhcp::readListening(serve->listen);
+        if (listening.port) {
+            fuzz::require(serve->listen.ends_with(':' + std::to_string(*listening.port)) ||
+                              serve->listen.find(":0") != std::string::npos,
+                          "a port stands behind a colon");
+        }
+        // In brackets an address has no end within itself.
+        if (listening.address.find(']') == std::string::npos) {
+            fuzz::require(
+                cimdhcp::readListening('[' + listening.address + ']').address == listening.address,
+                "an address survives being written");
+        }
+    } catch (const cimdhcp::Failure& failure) {
+        fuzz::require(failure.status() == cimdhcp::ExitStatus::usage, "what is wrong is the usage");
+    }
+}
+
+}  // namespace
+
+int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
+    const auto parts = fuzz::fields(fuzz::text(data, size));
+    try {
+        const auto read = readLine({parts.begin(), parts.end()});
+        const auto* const line = std::get_if<CommandLine>(&read);
+        if (line == nullptr) {
+            fuzz::require(!std::get<cimdhcp::Information>(read).text.empty(), "help helps");
+            return 0;
+        }
+        checkListening(*line);
+        fuzz::require(hasBrackets(*line) || readAgain(*line) == read,
+                      "a command line survives being written");
+    } catch (const cimdhcp::Failure& failure) {
+        fuzz::require(failure.status() == cimdhcp::ExitStatus::usage, "what is wrong is the usage");
+        fuzz::require(std::string_view(failure.what()).find('\n') == std::string_view::npos,
+                      "what is wrong is told in one line");
+    }
+    return 0;
+}

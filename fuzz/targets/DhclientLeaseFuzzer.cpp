@@ -1,0 +1,85 @@
+// Lease files of ISC dhclient.
+#include "clients/DhclientLease.h"
+
+#include <algorithm>
+#include <array>
+#include <set>
+
+#include "Input.h"
+#include "clients/Lease.h"
+#include "kernel/Link.h"
+#include "support/Addresses.h"
+
+namespace {
+
+using ZR::Live::DhclientLease;
+using ZR::Live::Lease;
+
+std::string quoted(const std::string& text) {
+    std::string result = "\"";
+    for (const char letter : text) {
+        std::array<char, 5> octal{};
+        static_cast<void>(std::snprintf(octal.data(), octal.size(), "\\%03o",
+                                        static_cast<unsigned>(static_cast<unsigned char>(letter))));
+        result += octal.data();
+    }
+    return result + '"';
+}
+
+/// The start and the lifetime that make an end.
+std::string endOf(std::int64_t expires) {
+    if (expires == Lease::never) {
+        return "max-life 4294967295;";
+    }
+    const std::int64_t lifetime = std::min<std::int64_t>(expires, UINT32_MAX - 1);
+    return "starts " + std::to_string(expires - lifetime) + "; max-life " +
+           std::to_string(lifetime) + ';';
+}
+
+/// The block as dhclient would write it.
+std::string written(const DhclientLease& lease) {
+    std::string text = lease.ipv6 ? "lease6 {\n" : "lease {\n";
+    text += "  interface " + quoted(lease.interfaceName) + ";\n";
+    for (const auto& address : lease.addresses) {
+        if (!lease.ipv6) {
+            text += "  fixed-address " + address.address + ";\n";
+            if (address.expires) {
+                text += *address.expires == Lease::never
+                            ? "  expire never;\n"
+                            : "  expire epoch " + std::to_string(*address.expires) + ";\n";
+            }
+        } else {
+            text += "  ia-na 00:00:00:01 {\n    iaaddr " + address.address + " {\n      " +
+                    (address.expires ? endOf(*address.expires) : "") + "\n    }\n  }\n";
+        }
+    }
+    if (!lease.server.empty()) {
+        text += "  option dhcp-server-identifier " + lease.server + ";\n";
+    }
+    return text + (lease.bootp ? "  bootp;\n" : "") + (lease.released ? "  released;\n" : "") +
+           "}\n";
+}
+
+}  // namespace
+
+int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
+    const auto parsed = ZR::Live::parseDhclientLeases(fuzz::text(data, size));
+    std::set<std::pair<bool, std::string>> names;
+    std::string text;
+    for (const DhclientLease& lease : parsed.leases) {
+        fuzz::require(ZR::Live::isInterfaceName(lease.interfaceName), "an interface has a name");
+        fuzz::require(names.emplace(lease.ipv6, lease.interfaceName).second,
+                      "an interface has one lease of a protocol");
+        fuzz::require(lease.server.empty() || fuzz::isAddress(AF_INET, lease.server),
+                      "a server is an address");
+        fuzz::require(lease.ipv6 || lease.addresses.size() <= 1, "IPv4 leases one address");
+        for (const auto& address : lease.addresses) {
+            fuzz::require(fuzz::isAddress(lease.ipv6 ? AF_INET6 : AF_INET, address.address),
+                          "what was leased is an address");
+        }
+        text += written(lease);
+    }
+    const auto again = ZR::Live::parseDhclientLeases(text);
+    fuzz::require(!again.torn && again.leases == parsed.leases, "leases survive being written");
+    return 0;
+}

@@ -1,0 +1,31 @@
+// ifcfg files, which are shell fragments.
+#include "configuration/Ifcfg.h"
+
+#include "Input.h"
+#include "formats/ShellAssignments.h"
+#include "support/Addresses.h"
+#include "support/ShellText.h"
+
+int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
+    const std::string_view text = fuzz::text(data, size);
+    const auto assignments = ZR::Live::parseShellAssignments(text);
+    std::string again;
+    for (const auto& assignment : assignments) {
+        again += fuzz::shellLine(assignment.name, assignment.value);
+    }
+    fuzz::require(ZR::Live::parseShellAssignments(again) == assignments,
+                  "assignments survive being written");
+
+    const auto file = ZR::Live::parseIfcfg(text);
+    again = fuzz::shellLine("DEVICE", file.device) + fuzz::shellLine("HWADDR", file.hardware) +
+            fuzz::shellLine("BOOTPROTO", file.bootProtocol) +
+            fuzz::shellLine("DHCPV6C", file.dhcp6 ? "YES" : "no");
+    for (const std::string& address : file.addresses) {
+        fuzz::require(fuzz::isAddress(AF_INET, address), "a fixed address is one");
+        again += fuzz::shellLine("IPADDR_x", address + "/24");
+    }
+    fuzz::require(ZR::Live::parseIfcfg(again) == file, "settings survive being written");
+    fuzz::require(!ZR::Live::isIfcfgName(std::string(text) + ".bak"),
+                  "left-over files do not count");
+    return 0;
+}

@@ -1,0 +1,77 @@
+// The files of systemd-networkd; those of netplan are of the same form.
+#include "clients/Networkd.h"
+
+#include <algorithm>
+
+#include "Input.h"
+#include "support/Addresses.h"
+
+namespace {
+
+/// In quotes, of which a reader takes one pair off.
+std::string line(const char* key, const std::string& value) {
+    return std::string(key) + "=\"" + value + "\"\n";
+}
+
+std::string spanOf(std::uint64_t seconds) {
+    return seconds == ZR::Live::infiniteTime ? "infinity" : std::to_string(seconds);
+}
+
+void checkTimeSpan(std::string_view text) {
+    if (const auto seconds = ZR::Live::parseTimeSpan(text)) {
+        fuzz::require(ZR::Live::parseTimeSpan(spanOf(*seconds)) == seconds,
+                      "a time span survives being written");
+    }
+}
+
+void checkLink(std::string_view text) {
+    const auto link = ZR::Live::parseNetworkdLink(text);
+    std::string again =
+        line("ADMIN_STATE", link.adminState) + line("NETWORK_FILE", link.networkFile);
+    if (link.leaseFile) {
+        again += line("DHCP_LEASE", *link.leaseFile);
+    }
+    fuzz::require(ZR::Live::parseNetworkdLink(again) == link, "a link survives being written");
+}
+
+void checkLease(std::string_view text) {
+    const auto lease = ZR::Live::parseNetworkdLease(text);
+    fuzz::require(lease.address.empty() || fuzz::isAddress(AF_INET, lease.address),
+                  "what was leased is an address");
+    fuzz::require(lease.server.empty() || fuzz::isAddress(AF_INET, lease.server),
+                  "a server is an address");
+    std::string again = "ADDRESS=" + lease.address + "\nSERVER_ADDRESS=" + lease.server + '\n';
+    for (const auto& [key, time] :
+         {std::pair{"T1", lease.renewal}, {"T2", lease.rebinding}, {"LIFETIME", lease.lifetime}}) {
+        if (time) {
+            again += key + ("=" + spanOf(*time)) + '\n';
+        }
+    }
+    fuzz::require(ZR::Live::parseNetworkdLease(again) == lease, "a lease survives being written");
+}
+
+void checkNetwork(std::string_view text) {
+    ZR::Live::NetworkFile file;
+    ZR::Live::applyNetworkFile(text, file);
+    std::string again = "[Match]\nName=" + file.matchName + "\n[Network]\nDHCP=";
+    again += file.dhcp4 ? (file.dhcp6 ? "yes" : "ipv4") : (file.dhcp6 ? "ipv6" : "no");
+    again += std::string("\nLinkLocalAddressing=") + (file.linkLocal4 ? "ipv4" : "no") + '\n';
+    for (const std::string& address : file.addresses) {
+        fuzz::require(fuzz::isAddress(AF_INET, address), "a fixed address is one");
+        again += "[Address]\nAddress=" + address + "/24\n";
+    }
+    ZR::Live::NetworkFile back;
+    ZR::Live::applyNetworkFile(again, back);
+    fuzz::require(back == file, "the settings of a network survive being written");
+}
+
+}  // namespace
+
+int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
+    const std::string_view text = fuzz::text(data, size);
+    checkTimeSpan(text);
+    checkLink(text);
+    checkLease(text);
+    checkNetwork(text);
+    return 0;
+}

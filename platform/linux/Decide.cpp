@@ -1,0 +1,94 @@
+#include "Decide.h"
+
+#include <sys/socket.h>
+
+#include <algorithm>
+#include <utility>
+
+#include "Precedence.h"
+#include "kernel/InterfaceRules.h"
+
+namespace ZR::Live {
+namespace {
+
+using NodeLexicon::Properties;
+
+constexpr std::uint64_t hostNameMaxLength = 64;  // HOST_NAME_MAX of Linux
+
+}  // namespace
+
+std::string describe(const Origin& origin) {
+    std::string text{origin.client ? nameOf(*origin.client) : std::string_view{}};
+    if (origin.pid != 0) {
+        text += ", process " + std::to_string(origin.pid);
+    }
+    if (!origin.file.empty()) {
+        text += text.empty() ? "" : " ";
+        text += origin.file;
+    }
+    return text.empty() ? "kernel" : text;
+}
+
+std::vector<Decision> decide(InterfaceView view) {
+    std::vector<Decision> decisions;
+    decisions.reserve(NodeLexicon::properties.size());
+    for (const DecisionRow& row : precedence()) {
+        if (!decisions.empty() && decisions.back().property == row.property) {
+            continue;
+        }
+        auto finding = row.answer(view);
+        if (!finding) {
+            continue;
+        }
+        if (row.property == Properties::IPv4Address) {
+            // The rows below speak about this very address.
+            const auto* const text = std::get_if<std::string>(&finding->value);
+            const auto own = std::find_if(
+                view.addresses.begin(), view.addresses.end(), [&](const Address& address) {
+                    return address.family == AF_INET && address.text == *text;
+                });
+            view.address = own == view.addresses.end() ? nullptr : &*own;
+        }
+        decisions.push_back({.property = row.property,
+                             .value = std::move(finding->value),
+                             .reason = row.reason,
+                             .origin = finding->origin});
+    }
+    return decisions;
+}
+
+std::shared_ptr<const Snapshot> decide(MachineFacts facts, std::int64_t now, Explain explain) {
+    const Machine machine{std::move(facts), now};
+    SnapshotBuilder builder;
+    if (explain == Explain::Yes) {
+        builder.origin("kernel: the name of the system");
+    }
+    const auto computer = builder.add(Snapshot::none, "ComputerSystem", "Computer");
+    builder.property(Properties::Name, machine.hostName());
+    builder.property(Properties::NameMaxLength, hostNameMaxLength);
+    const auto network = builder.add(computer, "Network", "Network");
+    for (const InterfaceView& view : machine.interfaces()) {
+        builder.add(network, "NetworkInterface", std::string{describe(*view.link)});
+        for (Decision& decision : decide(view)) {
+            // A link can be renamed, but not by a client of this tree: the kernel forgets
+            // the new name at the next start, and leases and settings are found by name.
+            const bool readOnly = decision.property == Properties::Name;
+            if (explain == Explain::Yes) {
+                builder.origin(describe(decision.origin) + ": " + std::string{decision.reason});
+            }
+            builder.property(decision.property, std::move(decision.value), readOnly);
+        }
+    }
+    if (machine.serviceProcessor()) {
+        if (explain == Explain::Yes) {
+            builder.origin("service processor, by IPMI");
+        }
+        addServiceProcessor(*machine.serviceProcessor(), builder);
+    }
+    for (const std::string& complaint : machine.complaints()) {
+        builder.remark(complaint);
+    }
+    return builder.build();
+}
+
+}  // namespace ZR::Live

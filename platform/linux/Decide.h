@@ -1,0 +1,39 @@
+#pragma once
+
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "Machine.h"
+#include "Precedence.h"
+#include "zrclient/NodeLexicon.h"
+#include "zrclient/Snapshot.h"
+#include "zrlinux/LiveSource.h"
+
+namespace ZR::Live {
+
+/// A property that was decided, and why so. Borrows the facts.
+struct Decision {
+    NodeLexicon::Properties property{};
+    PropertyValue value;
+    std::string_view reason;
+    Origin origin{};
+
+    bool operator==(const Decision&) const = default;
+};
+
+/// For people: "dhclient /var/lib/dhcp/dhclient.leases", "dhcpcd, process 17", "kernel".
+[[nodiscard]] std::string describe(const Origin& origin);
+
+/// Decides all properties of one interface, in the order of the table.
+[[nodiscard]] std::vector<Decision> decide(InterfaceView view);
+
+/// The tree of a machine: the computer, its network, and the interfaces in it; behind
+/// it the service processor, where there is one; and what could not be read as remarks.
+/// Depends on nothing but the facts and the time, in seconds since the epoch.
+[[nodiscard]] std::shared_ptr<const Snapshot> decide(MachineFacts facts, std::int64_t now,
+                                                     Explain explain = Explain::No);
+
+}  // namespace ZR::Live

@@ -1,0 +1,77 @@
+#pragma once
+
+#include <chrono>
+#include <cstdint>
+#include <functional>
+#include <memory>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <unordered_set>
+#include <vector>
+
+#include "clients/NetworkdBus.h"
+#include "formats/Roots.h"
+#include "ipmi/IpmiReader.h"
+#include "kernel/ChangeMonitor.h"
+#include "kernel/NetlinkTransport.h"
+#include "kernel/RtnetlinkReader.h"
+#include "zrclient/SnapshotSource.h"
+#include "zrlinux/LiveSource.h"
+
+namespace ZR::Live {
+
+/// What a live machine is read from.
+struct Surroundings {
+    Roots roots;
+    std::unique_ptr<NetlinkTransport> transport = kernelTransport();
+    /// Seconds since the epoch.
+    std::function<std::int64_t()> now = [] {
+        return static_cast<std::int64_t>(
+            std::chrono::system_clock::to_time_t(std::chrono::system_clock::now()));
+    };
+    /// False when the process file system is one that was laid out: its numbers
+    /// then are those of other processes.
+    bool realProcesses = true;
+    /// The way to the service processor; null: the device of the machine at `roots`.
+    std::unique_ptr<IpmiTransport> ipmi = nullptr;
+    IpmiReader::Clock uptime = std::chrono::steady_clock::now;
+    /// Asks networkd for its description of itself; none: nobody is asked.
+    std::function<NetworkdAnswer(std::chrono::steady_clock::time_point)> askNetworkd =
+        Live::askNetworkd;
+    Explain explain = Explain::No;
+    /// Takes what could not be read, or not for certain.
+    std::function<void(std::string_view)> complain;
+};
+
+/// The machine as its kernel and its DHCP clients show it now.
+class LiveMachine final : public SnapshotSource {
+  public:
+    explicit LiveMachine(Surroundings surroundings);
+
+    [[nodiscard]] bool changed() override;
+    [[nodiscard]] bool awaiting() override;
+    [[nodiscard]] std::shared_ptr<const Snapshot> read() override;
+
+  private:
+    [[nodiscard]] std::shared_ptr<const Snapshot> tryToRead();
+    [[nodiscard]] ClientFacts readClients();
+    void consultNetworkd(ClientFacts& clients);
+    void watchProcesses(const ClientFacts& clients);
+    [[nodiscard]] bool socketsChanged() const;
+    void planAnotherTry(const std::vector<std::string>& complaints);
+    void report(const std::vector<std::string>& complaints);
+
+    Surroundings surroundings_;
+    RtnetlinkReader reader_;
+    ChangeMonitor monitor_;
+    IpmiReader processor_;
+    std::vector<WatchedPlace> places_;
+    std::optional<ClientFacts> sockets_;  // where nothing else tells of who has them
+    std::chrono::steady_clock::time_point networkdRest_;  // not to be asked before
+    std::unordered_set<std::string> reported_;            // of the last reading
+    bool troubled_ = false;                               // something could not be read
+    std::chrono::steady_clock::time_point troubleRest_;   // it is not tried again before
+};
+
+}  // namespace ZR::Live

@@ -1,0 +1,383 @@
+#include "Precedence.h"
+
+#include <linux/if_addr.h>
+#include <linux/rtnetlink.h>
+#include <sys/socket.h>
+
+#include <algorithm>
+#include <array>
+#include <utility>
+
+#include "kernel/InterfaceRules.h"
+
+namespace ZR::Live {
+namespace {
+
+using NodeLexicon::AddressSource;
+using NodeLexicon::Properties;
+using Answer = std::optional<Finding>;
+
+constexpr std::uint64_t interfaceNameMaxLength = 15;  // IFNAMSIZ without the NUL
+
+constexpr std::string_view socketFile = "/proc/net/udp";
+
+PropertyValue source(AddressSource value) {
+    return std::uint64_t{static_cast<unsigned int>(value)};
+}
+
+Finding kernel(PropertyValue value) {
+    return {.value = std::move(value)};
+}
+Finding from(const Lease& lease, PropertyValue value) {
+    return {.value = std::move(value), .origin = {.client = lease.client, .file = lease.origin}};
+}
+Finding from(const LinkConfiguration& configuration, PropertyValue value) {
+    return {.value = std::move(value),
+            .origin = {.client = configuration.client, .file = configuration.origin}};
+}
+Finding from(const ClientProcess& process, PropertyValue value) {
+    return {.value = std::move(value),
+            .origin = {.client = process.client, .file = {}, .pid = process.pid}};
+}
+Finding fromSocket(PropertyValue value) {
+    return {.value = std::move(value), .origin = {.client = {}, .file = socketFile}};
+}
+
+bool isUsableIPv4(const Address& address) {
+    return address.family == AF_INET && (address.flags & (IFA_F_TENTATIVE | IFA_F_DADFAILED)) == 0;
+}
+
+template <typename Condition>
+Answer firstIPv4(const InterfaceView& view, Condition condition) {
+    for (const Address& address : view.addresses) {
+        if (isUsableIPv4(address) && condition(address)) {
+            return kernel(address.text);
+        }
+    }
+    return std::nullopt;
+}
+
+bool hasEnd(const Address& address) {
+    return address.validLifetime != Address::infinite;
+}
+
+bool isPermanent(const Address& address) {
+    return (address.flags & IFA_F_PERMANENT) != 0;
+}
+
+bool isLinkLocal(const Address& address) {
+    return address.scope == RT_SCOPE_LINK && address.text.starts_with("169.254.");
+}
+
+const Lease* leaseOf(const InterfaceView& view) {
+    for (const Lease* lease : view.leases) {
+        if (view.address != nullptr && lease->address == view.address->text) {
+            return lease;
+        }
+    }
+    return nullptr;
+}
+
+/// A DHCPv4 client that runs on the link; null for none.
+const ClientProcess* process4(const InterfaceView& view) {
+    const auto found = std::find_if(view.processes.begin(), view.processes.end(),
+                                    [](const ClientProcess* process) { return !process->ipv6; });
+    return found == view.processes.end() ? nullptr : *found;
+}
+
+/// Whether a configuration asks for DHCP of either protocol; nullopt when it does not tell.
+std::optional<bool> wantsDhcp(const LinkConfiguration& configuration) {
+    if (configuration.dhcp4.value_or(false) || configuration.dhcp6.value_or(false)) {
+        return true;
+    }
+    return configuration.dhcp4;
+}
+
+/// What says how the link is to be configured: its manager, or else the files of such.
+const LinkConfiguration* intent(const InterfaceView& view) {
+    return view.management != nullptr && view.management->dhcp4 ? view.management
+                                                                : view.configuration;
+}
+
+bool names(const LinkConfiguration& configuration, const Address& address) {
+    const auto& told = configuration.staticAddresses;
+    return std::find(told.begin(), told.end(), address.text) != told.end();
+}
+
+AddressSource sourceOf(const Lease& lease) {
+    return lease.bootp ? AddressSource::BOOTP : AddressSource::DHCP;
+}
+
+/// Each server once, that of the interface's own address first. Where two clients
+/// claim one address, only the first is heard: the one that runs.
+Answer servers(const InterfaceView& view) {
+    std::vector<std::string> found;
+    std::vector<std::string_view> heard;
+    const Lease* first = nullptr;
+    const auto hear = [&](const Lease& lease) {
+        if (std::find(heard.begin(), heard.end(), lease.address) != heard.end()) {
+            return;
+        }
+        heard.emplace_back(lease.address);
+        if (!lease.server.empty() &&
+            std::find(found.begin(), found.end(), lease.server) == found.end()) {
+            first = first == nullptr ? &lease : first;
+            found.push_back(lease.server);
+        }
+    };
+    if (const Lease* own = leaseOf(view)) {
+        hear(*own);
+    }
+    for (const auto* leases : {&view.leases, &view.leases6}) {
+        for (const Lease* lease : *leases) {
+            hear(*lease);
+        }
+    }
+    return first == nullptr ? Answer{} : from(*first, std::move(found));
+}
+
+constexpr std::array rows{
+    DecisionRow{Properties::Name, "the kernel's name of the link",
+                [](const InterfaceView& view) -> Answer { return kernel(view.link->name); }},
+    DecisionRow{
+        Properties::NameMaxLength, "the kernel takes no longer names",
+        [](const InterfaceView& /*view*/) -> Answer { return kernel(interfaceNameMaxLength); }},
+    DecisionRow{Properties::InterfaceState, "administrative and operational state of the link",
+                [](const InterfaceView& view) -> Answer {
+                    return kernel(std::uint64_t{isActive(*view.link) ? 1U : 0U});
+                }},
+
+    DecisionRow{Properties::IPv4Address, "the address that a DHCP server leased",
+                [](const InterfaceView& view) -> Answer {
+                    if (view.leases.empty()) {
+                        return std::nullopt;
+                    }
+                    const Lease& lease = *view.leases.front();
+                    return from(lease, lease.address);
+                }},
+    DecisionRow{Properties::IPv4Address, "the first address of its network with global scope",
+                [](const InterfaceView& view) {
+                    return firstIPv4(view, [](const Address& address) {
+                        return (address.flags & IFA_F_SECONDARY) == 0 &&
+                               address.scope == RT_SCOPE_UNIVERSE;
+                    });
+                }},
+    DecisionRow{Properties::IPv4Address, "a further address, or one of the site's",
+                [](const InterfaceView& view) {
+                    return firstIPv4(
+                        view, [](const Address& address) { return address.scope < RT_SCOPE_LINK; });
+                }},
+    DecisionRow{Properties::IPv4Address, "an address of the link only",
+                [](const InterfaceView& view) {
+                    return firstIPv4(view, [](const Address& address) {
+                        return address.scope == RT_SCOPE_LINK;
+                    });
+                }},
+
+    DecisionRow{
+        Properties::DHCPEnabled, "the master owns the addresses of its ports",
+        [](const InterfaceView& view) { return view.enslaved ? Answer{kernel(false)} : Answer{}; }},
+    DecisionRow{Properties::DHCPEnabled, "the link's manager holds a lease",
+                [](const InterfaceView& view) -> Answer {
+                    for (const auto* leases : {&view.leases, &view.leases6}) {
+                        for (const Lease* lease : *leases) {
+                            if (view.management != nullptr &&
+                                lease->client == view.management->client) {
+                                return from(*lease, true);
+                            }
+                        }
+                    }
+                    return std::nullopt;
+                }},
+    DecisionRow{Properties::DHCPEnabled, "the configuration of the link's manager",
+                [](const InterfaceView& view) -> Answer {
+                    const auto wanted =
+                        view.management == nullptr ? std::nullopt : wantsDhcp(*view.management);
+                    return wanted ? Answer{from(*view.management, *wanted)} : Answer{};
+                }},
+    DecisionRow{Properties::DHCPEnabled, "a client runs on the link",
+                [](const InterfaceView& view) -> Answer {
+                    return view.processes.empty() ? Answer{} : from(*view.processes.front(), true);
+                }},
+    DecisionRow{Properties::DHCPEnabled, "a client that runs holds a lease of the link",
+                [](const InterfaceView& view) -> Answer {
+                    // It may have been started under another name of the link.
+                    return !view.leases.empty() && view.leases.front()->clientAlive
+                               ? Answer{from(*view.leases.front(), true)}
+                               : Answer{};
+                }},
+    DecisionRow{Properties::DHCPEnabled, "somebody listens on the link's DHCP client port",
+                [](const InterfaceView& view) {
+                    return view.socket != nullptr || view.openSocket != nullptr
+                               ? Answer{fromSocket(true)}
+                               : Answer{};
+                }},
+    DecisionRow{Properties::DHCPEnabled, "the configuration that is kept for the link",
+                [](const InterfaceView& view) -> Answer {
+                    const auto wanted = view.configuration == nullptr
+                                            ? std::nullopt
+                                            : wantsDhcp(*view.configuration);
+                    return wanted ? Answer{from(*view.configuration, *wanted)} : Answer{};
+                }},
+    DecisionRow{Properties::DHCPEnabled,
+                "an IPv4 address with an end: somebody renews it, and only DHCP does",
+                [](const InterfaceView& view) {
+                    return firstIPv4(view, hasEnd) ? Answer{kernel(true)} : Answer{};
+                }},
+    DecisionRow{Properties::DHCPEnabled, "nothing speaks for DHCP",
+                [](const InterfaceView& /*view*/) -> Answer { return kernel(false); }},
+
+    DecisionRow{Properties::AddressSource, "the master owns the addresses of its ports",
+                [](const InterfaceView& view) {
+                    return view.enslaved ? Answer{kernel(source(AddressSource::Unknown))}
+                                         : Answer{};
+                }},
+    DecisionRow{Properties::AddressSource, "a live lease names this very address",
+                [](const InterfaceView& view) -> Answer {
+                    const Lease* const lease = leaseOf(view);
+                    return lease == nullptr ? Answer{} : from(*lease, source(sourceOf(*lease)));
+                }},
+    DecisionRow{Properties::AddressSource, "the link's manager was told this very address",
+                [](const InterfaceView& view) -> Answer {
+                    return view.management != nullptr && view.address != nullptr &&
+                                   names(*view.management, *view.address)
+                               ? Answer{from(*view.management, source(AddressSource::Static))}
+                               : Answer{};
+                }},
+    DecisionRow{Properties::AddressSource, "169.254/16 with link scope (RFC 3927)",
+                [](const InterfaceView& view) {
+                    return view.address != nullptr && isLinkLocal(*view.address)
+                               ? Answer{kernel(source(AddressSource::LinkLocal))}
+                               : Answer{};
+                }},
+    DecisionRow{Properties::AddressSource, "the link's manager uses the address for others",
+                [](const InterfaceView& view) -> Answer {
+                    return view.management != nullptr && view.address != nullptr &&
+                                   view.management->other4
+                               ? Answer{from(*view.management, source(AddressSource::Other))}
+                               : Answer{};
+                }},
+    DecisionRow{Properties::AddressSource, "a DHCP client listens at this very address",
+                [](const InterfaceView& view) {
+                    return view.address != nullptr && view.socket != nullptr &&
+                                   view.socket->address == view.address->text
+                               ? Answer{fromSocket(source(AddressSource::DHCP))}
+                               : Answer{};
+                }},
+    DecisionRow{Properties::AddressSource,
+                "an IPv4 address with an end: somebody renews it, and only DHCP does",
+                [](const InterfaceView& view) {
+                    return view.address != nullptr && hasEnd(*view.address)
+                               ? Answer{kernel(source(AddressSource::DHCP))}
+                               : Answer{};
+                }},
+    DecisionRow{
+        Properties::AddressSource, "set once at the start of the system, and left as it is since",
+        [](const InterfaceView& view) -> Answer {
+            return view.address != nullptr && view.formerLease != nullptr &&
+                           view.formerLease->address == view.address->text
+                       ? Answer{from(*view.formerLease, source(sourceOf(*view.formerLease)))}
+                       : Answer{};
+        }},
+    DecisionRow{Properties::AddressSource, "udhcpc runs, which sets addresses without an end",
+                [](const InterfaceView& view) -> Answer {
+                    const ClientProcess* const process = process4(view);
+                    return view.address != nullptr && isPermanent(*view.address) &&
+                                   process != nullptr && process->client == Client::Udhcpc
+                               ? Answer{from(*process, source(AddressSource::DHCP))}
+                               : Answer{};
+                }},
+    DecisionRow{Properties::AddressSource, "the configuration names this very address",
+                [](const InterfaceView& view) -> Answer {
+                    return view.configuration != nullptr && view.address != nullptr &&
+                                   names(*view.configuration, *view.address)
+                               ? Answer{from(*view.configuration, source(AddressSource::Static))}
+                               : Answer{};
+                }},
+    DecisionRow{Properties::AddressSource,
+                "the configuration that is kept for the link, which no manager has",
+                [](const InterfaceView& view) -> Answer {
+                    if (view.configuration == nullptr || view.management != nullptr ||
+                        view.address == nullptr) {
+                        return std::nullopt;
+                    }
+                    const LinkConfiguration& configuration = *view.configuration;
+                    if (configuration.dhcp4.value_or(false)) {
+                        return from(configuration, source(AddressSource::DHCP));
+                    }
+                    if (configuration.bootp4) {
+                        return from(configuration, source(AddressSource::BOOTP));
+                    }
+                    return configuration.other4
+                               ? Answer{from(configuration, source(AddressSource::Other))}
+                               : Answer{};
+                }},
+    DecisionRow{Properties::AddressSource, "permanent, and no DHCPv4 client that could have set it",
+                [](const InterfaceView& view) {
+                    const bool managerWantsDhcp =
+                        view.management != nullptr && view.management->dhcp4.value_or(false);
+                    return view.address != nullptr && isPermanent(*view.address) &&
+                                   process4(view) == nullptr && !managerWantsDhcp
+                               ? Answer{kernel(source(AddressSource::Static))}
+                               : Answer{};
+                }},
+    DecisionRow{Properties::AddressSource, "an address that nobody speaks for",
+                [](const InterfaceView& view) {
+                    return view.address != nullptr ? Answer{kernel(source(AddressSource::Unknown))}
+                                                   : Answer{};
+                }},
+    DecisionRow{Properties::AddressSource, "no address yet: a DHCP client is to give one",
+                [](const InterfaceView& view) -> Answer {
+                    const ClientProcess* const process = process4(view);
+                    return process != nullptr ? Answer{from(*process, source(AddressSource::DHCP))}
+                                              : Answer{};
+                }},
+    DecisionRow{Properties::AddressSource, "no address yet: what is meant to give one",
+                [](const InterfaceView& view) -> Answer {
+                    const LinkConfiguration* const meant = intent(view);
+                    if (meant == nullptr) {
+                        return std::nullopt;
+                    }
+                    if (meant->dhcp4.value_or(false)) {
+                        return from(*meant, source(AddressSource::DHCP));
+                    }
+                    if (meant->bootp4) {
+                        return from(*meant, source(AddressSource::BOOTP));
+                    }
+                    if (!meant->staticAddresses.empty()) {
+                        return from(*meant, source(AddressSource::Static));
+                    }
+                    if (meant->linkLocal4) {
+                        return from(*meant, source(AddressSource::LinkLocal));
+                    }
+                    return meant->other4 ? Answer{from(*meant, source(AddressSource::Other))}
+                                         : Answer{};
+                }},
+    DecisionRow{Properties::AddressSource, "no address, and nobody means to give one",
+                [](const InterfaceView& /*view*/) -> Answer {
+                    return kernel(source(AddressSource::Unknown));
+                }},
+
+    DecisionRow{Properties::DHCPServerAddresses, "the master owns the addresses of its ports",
+                [](const InterfaceView& view) {
+                    return view.enslaved ? Answer{kernel(std::vector<std::string>{})} : Answer{};
+                }},
+    DecisionRow{Properties::DHCPServerAddresses, "the servers of the live leases", servers},
+    DecisionRow{Properties::DHCPServerAddresses, "the one that the link's DHCP client talks to",
+                [](const InterfaceView& view) {
+                    return view.socket != nullptr && !view.socket->peer.empty()
+                               ? Answer{fromSocket(std::vector{view.socket->peer})}
+                               : Answer{};
+                }},
+    DecisionRow{
+        Properties::DHCPServerAddresses, "nobody tells of a server",
+        [](const InterfaceView& /*view*/) -> Answer { return kernel(std::vector<std::string>{}); }},
+};
+
+}  // namespace
+
+std::span<const DecisionRow> precedence() {
+    return rows;
+}
+
+}  // namespace ZR::Live

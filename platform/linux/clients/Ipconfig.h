@@ -1,0 +1,32 @@
+#pragma once
+
+#include <string_view>
+
+#include "clients/Lease.h"
+#include "formats/Roots.h"
+
+namespace ZR::Live {
+
+/// Where ipconfig of klibc, with which an initial RAM file system boots over the
+/// network, leaves net-INTERFACE.conf.
+inline constexpr std::string_view ipconfigDirectory = "/run";
+inline constexpr std::string_view ipconfigPrefix = "net-";
+
+/// The result of one ipconfig.
+struct IpconfigResult {
+    enum class Protocol : std::uint8_t { Other, Dhcp, Bootp };
+
+    std::string interfaceName;
+    Protocol protocol = Protocol::Other;
+    std::string address;          ///< canonical IPv4 text; empty for none
+    std::string server;           ///< of the boot files, the best guess at the DHCP server
+    std::uint32_t leaseTime = 0;  ///< seconds; 0 and UINT32_MAX: for ever
+
+    bool operator==(const IpconfigResult&) const = default;
+};
+[[nodiscard]] IpconfigResult parseIpconfig(std::string_view text);
+
+/// Adds what ipconfig was given.
+void readIpconfig(const Roots& roots, ClientFacts& facts);
+
+}  // namespace ZR::Live

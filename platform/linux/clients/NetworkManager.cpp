@@ -1,0 +1,260 @@
+#include "clients/NetworkManager.h"
+
+#include <sys/socket.h>
+#include <sys/stat.h>
+
+#include <algorithm>
+#include <cstddef>
+#include <utility>
+
+#include "clients/Networkd.h"
+#include "formats/AddressText.h"
+#include "formats/Files.h"
+#include "formats/KeyFile.h"
+#include "formats/Numbers.h"
+#include "kernel/Link.h"
+
+namespace ZR::Live {
+namespace {
+
+constexpr std::string_view internalLeasePrefix = "internal-";
+constexpr std::string_view leaseSuffix = ".lease";
+constexpr std::size_t uuidLength = 36;
+
+/// "address", "address1", "addresses" and so on; "address-data" is none of ours.
+bool isAddressKey(std::string_view key) {
+    if (!key.starts_with("address")) {
+        return false;
+    }
+    key.remove_prefix(std::string_view{"address"}.size());
+    return key.empty() || key == "es" ||
+           key.find_first_not_of("0123456789") == std::string_view::npos;
+}
+
+/// Takes "ADDRESS/LENGTH,GATEWAY", or in the older form a list with ";" between.
+void addAddresses(std::string_view value, std::vector<std::string>& addresses) {
+    while (!value.empty()) {
+        const std::size_t end = std::min(value.find(';'), value.size());
+        const std::string_view item = value.substr(0, end);
+        value.remove_prefix(std::min(end + 1, value.size()));
+        if (auto address = canonicalIPv4(item.substr(0, item.find(','))); !address.empty()) {
+            addresses.push_back(std::move(address));
+        }
+    }
+}
+
+struct ProfileFile {
+    std::string path;
+    NetworkManagerProfile profile;
+};
+
+std::vector<ProfileFile> readProfiles(const Roots& roots, ClientFacts& facts) {
+    std::vector<ProfileFile> profiles;
+    for (const std::string_view directory : networkManagerProfiles) {
+        const std::string place = roots.path(directory);
+        for (const std::string& name : listOptionalDirectory(place, facts.complaints)) {
+            std::string path = pathIn(place, name);
+            if (const auto text = readOptionalFile(path, facts.complaints)) {
+                profiles.push_back(
+                    {.path = std::move(path), .profile = parseNetworkManagerProfile(*text)});
+            }
+        }
+    }
+    return profiles;
+}
+
+/// What a profile says. Methods that nobody here knows say nothing.
+LinkConfiguration configurationOf(const ProfileFile& file) {
+    const NetworkManagerProfile& profile = file.profile;
+    LinkConfiguration configuration{.client = Client::NetworkManager,
+                                    .dhcp4 = {},
+                                    .dhcp6 = {},
+                                    .staticAddresses = profile.addresses4,
+                                    .origin = file.path};
+    const std::string& method = profile.method4;
+    if (method == "auto") {
+        configuration.dhcp4 = true;
+    } else if (method == "manual" || method == "link-local" || method == "shared" ||
+               method == "disabled") {
+        configuration.dhcp4 = false;
+        configuration.linkLocal4 = method == "link-local";
+        configuration.other4 = method == "shared";
+    }
+    // With "auto" the routers of the link decide whether DHCPv6 is used.
+    if (profile.method6 == "dhcp") {
+        configuration.dhcp6 = true;
+    } else if (!profile.method6.empty() && profile.method6 != "auto") {
+        configuration.dhcp6 = false;
+    }
+    return configuration;
+}
+
+void addManagement(std::uint32_t ifindex, const NetworkManagerDevice& device,
+                   const std::string& origin, const std::vector<ProfileFile>& profiles,
+                   ClientFacts& facts) {
+    LinkConfiguration management{.client = Client::NetworkManager,
+                                 .dhcp4 = {},
+                                 .dhcp6 = {},
+                                 .staticAddresses = {},
+                                 .origin = origin};
+    const auto active =
+        std::find_if(profiles.begin(), profiles.end(), [&](const ProfileFile& file) {
+            return !device.profile.empty() && file.profile.uuid == device.profile;
+        });
+    if (active != profiles.end()) {
+        if (active->profile.external) {
+            return;
+        }
+        management = configurationOf(*active);
+    }
+    management.ifindex = ifindex;
+    // Without the right to read the profile, a lease tells of it; without a lease,
+    // DHCP may still be on its way.
+    if (device.dhcp4) {
+        management.dhcp4 = true;
+    }
+    if (device.dhcp6) {
+        management.dhcp6 = true;
+    }
+    facts.managements.push_back(std::move(management));
+}
+
+void readDevices(const Roots& roots, const std::vector<ProfileFile>& profiles, ClientFacts& facts) {
+    if (facts.runsElsewhere(Client::NetworkManager)) {
+        return;
+    }
+    const bool alive = facts.runs(Client::NetworkManager);
+    const std::string devices = roots.path(networkManagerDevices);
+    for (const std::string& name : listOptionalDirectory(devices, facts.complaints)) {
+        const auto ifindex = parseNumber<std::uint32_t>(name);
+        std::string path = pathIn(devices, name);
+        const auto text = ifindex ? readOptionalFile(path, facts.complaints) : std::nullopt;
+        if (!text) {
+            continue;
+        }
+        NetworkManagerDevice device = parseNetworkManagerDevice(*text);
+        if (alive && device.managed) {
+            addManagement(*ifindex, device, path, profiles, facts);
+        }
+        if (!device.address4.empty()) {
+            facts.leases.push_back({.client = Client::NetworkManager,
+                                    .interfaceName = {},
+                                    .ifindex = *ifindex,
+                                    .family = AF_INET,
+                                    .address = std::move(device.address4),
+                                    .server = std::move(device.server4),
+                                    .clientAlive = alive,
+                                    .expires = device.expires4,
+                                    .origin = std::move(path)});
+        }
+    }
+}
+
+/// The files of the built-in client. Newer versions keep nothing but the address, in
+/// order to ask for it again: it may be anybody's by now, and proves nothing.
+void readInternalLeases(const Roots& roots, ClientFacts& facts) {
+    const std::string directory = roots.path(networkManagerState);
+    for (const std::string& name : listOptionalDirectory(directory, facts.complaints)) {
+        auto interface = internalLeaseInterface(name);
+        std::string path = pathIn(directory, name);
+        struct stat status {};
+        if (!interface || ::stat(path.c_str(), &status) != 0) {
+            continue;
+        }
+        const auto text = readOptionalFile(path, facts.complaints);
+        NetworkdLease lease = parseNetworkdLease(text.value_or(""));
+        if (lease.address.empty() || !lease.lifetime) {
+            continue;
+        }
+        const bool endless = *lease.lifetime >= UINT32_MAX;
+        facts.leases.push_back({.client = Client::NetworkManager,
+                                .interfaceName = *std::move(interface),
+                                .family = AF_INET,
+                                .address = std::move(lease.address),
+                                .server = std::move(lease.server),
+                                .expires = endless ? Lease::never
+                                                   : status.st_mtim.tv_sec +
+                                                         static_cast<std::int64_t>(*lease.lifetime),
+                                .origin = std::move(path)});
+    }
+}
+
+}  // namespace
+
+NetworkManagerDevice parseNetworkManagerDevice(std::string_view text) {
+    NetworkManagerDevice device;
+    forEachKey(text, [&](std::string_view section, std::string_view key, std::string_view value) {
+        if (section == "device") {
+            if (key == "managed") {
+                device.managed = value == "true";
+            } else if (key == "connection-uuid") {
+                device.profile = value;
+            }
+        } else if (section == "dhcp4") {
+            device.dhcp4 = true;
+            if (key == "dhcp4.ip_address") {
+                device.address4 = canonicalIPv4(value);
+            } else if (key == "dhcp4.dhcp_server_identifier") {
+                device.server4 = canonicalIPv4(value);
+            } else if (key == "dhcp4.expiry") {
+                // A time that cannot be read is over.
+                device.expires4 = parseNumber<std::int64_t>(value).value_or(0);
+            }
+        } else if (section == "dhcp6") {
+            device.dhcp6 = true;
+        }
+    });
+    return device;
+}
+
+NetworkManagerProfile parseNetworkManagerProfile(std::string_view text) {
+    NetworkManagerProfile profile;
+    forEachKey(text, [&](std::string_view section, std::string_view key, std::string_view value) {
+        if (section == "connection") {
+            if (key == "uuid") {
+                profile.uuid = value;
+            } else if (key == "interface-name") {
+                profile.interfaceName = value;
+            }
+        } else if (section == "ipv4") {
+            if (key == "method") {
+                profile.method4 = value;
+            } else if (isAddressKey(key)) {
+                addAddresses(value, profile.addresses4);
+            }
+        } else if (section == "ipv6" && key == "method") {
+            profile.method6 = value;
+        } else if (section == ".nmmeta" && key == "external") {
+            profile.external = value == "true";
+        }
+    });
+    return profile;
+}
+
+std::optional<std::string> internalLeaseInterface(std::string_view fileName) {
+    if (!fileName.starts_with(internalLeasePrefix) || !fileName.ends_with(leaseSuffix)) {
+        return std::nullopt;
+    }
+    fileName.remove_prefix(internalLeasePrefix.size());
+    fileName.remove_suffix(leaseSuffix.size());
+    if (fileName.size() <= uuidLength + 1 || fileName[uuidLength] != '-') {
+        return std::nullopt;
+    }
+    const std::string_view interface = fileName.substr(uuidLength + 1);
+    return isInterfaceName(interface) ? std::optional{std::string{interface}} : std::nullopt;
+}
+
+void readNetworkManager(const Roots& roots, ClientFacts& facts) {
+    const std::vector<ProfileFile> profiles = readProfiles(roots, facts);
+    readDevices(roots, profiles, facts);
+    readInternalLeases(roots, facts);
+    for (const ProfileFile& file : profiles) {
+        if (isInterfaceName(file.profile.interfaceName) && !file.profile.external) {
+            LinkConfiguration configuration = configurationOf(file);
+            configuration.interfaceName = file.profile.interfaceName;
+            facts.configurations.push_back(std::move(configuration));
+        }
+    }
+}
+
+}  // namespace ZR::Live

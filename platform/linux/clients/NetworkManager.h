@@ -1,0 +1,57 @@
+#pragma once
+
+#include <array>
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "clients/Lease.h"
+#include "formats/Roots.h"
+
+namespace ZR::Live {
+
+inline constexpr std::string_view networkManagerDevices = "/run/NetworkManager/devices";
+inline constexpr std::string_view networkManagerState = "/var/lib/NetworkManager";
+
+/// Where connection profiles lie.
+inline constexpr std::array<std::string_view, 3> networkManagerProfiles{
+    "/etc/NetworkManager/system-connections", "/run/NetworkManager/system-connections",
+    "/usr/lib/NetworkManager/system-connections"};
+
+/// The state file of one device, /run/NetworkManager/devices/IFINDEX.
+struct NetworkManagerDevice {
+    bool managed = false;
+    std::string profile;                   ///< UUID of the active connection; empty for none
+    bool dhcp4 = false;                    ///< there is a DHCPv4 lease
+    bool dhcp6 = false;                    ///< there is a DHCPv6 lease
+    std::string address4;                  ///< leased, canonical text
+    std::string server4;                   ///< DHCP option 54, canonical text
+    std::int64_t expires4 = Lease::never;  ///< epoch seconds; the file names no infinite one
+
+    bool operator==(const NetworkManagerDevice&) const = default;
+};
+[[nodiscard]] NetworkManagerDevice parseNetworkManagerDevice(std::string_view text);
+
+/// A connection profile: a key file NAME.nmconnection.
+struct NetworkManagerProfile {
+    std::string uuid;  ///< empty when the program derives it from the file's name
+    std::string interfaceName;
+    std::string method4;                  ///< "auto", "manual", "link-local", "shared", ...
+    std::string method6;                  ///< "auto", "dhcp", ...
+    std::vector<std::string> addresses4;  ///< canonical text, without prefix length
+    bool external = false;                ///< describes what others have set up
+
+    bool operator==(const NetworkManagerProfile&) const = default;
+};
+[[nodiscard]] NetworkManagerProfile parseNetworkManagerProfile(std::string_view text);
+
+/// The interface in the name internal-UUID-INTERFACE.lease; nullopt for other names.
+[[nodiscard]] std::optional<std::string> internalLeaseInterface(std::string_view fileName);
+
+/// Adds leases, managements and profiles. Needs the processes to be in the facts:
+/// the state files outlive the program.
+void readNetworkManager(const Roots& roots, ClientFacts& facts);
+
+}  // namespace ZR::Live

@@ -1,0 +1,55 @@
+#include "clients/SdBus.h"
+
+#include <dlfcn.h>
+
+#include <mutex>
+#include <type_traits>
+
+namespace ZR::Live {
+
+std::shared_ptr<const SdBus> SdBus::get() {
+    static std::mutex mutex;
+    static std::shared_ptr<const SdBus> functions;
+    const std::lock_guard lock(mutex);
+    // What was in the way, a want of descriptors say, may be over.
+    if (!functions || !functions->missing().empty()) {
+        functions = std::make_shared<const SdBus>("libsystemd.so.0");
+    }
+    return functions;
+}
+
+SdBus::SdBus(const char* library) : handle_(::dlopen(library, RTLD_NOW | RTLD_LOCAL)) {
+    const auto tellWhy = [this] {
+        const char* const reason = ::dlerror();
+        missing_ = reason == nullptr ? "the library cannot be loaded" : reason;
+    };
+    if (!handle_) {
+        tellWhy();
+        return;
+    }
+    const auto find = [&](auto& function, const char* name) {
+        void* const symbol = ::dlsym(handle_.get(), name);
+        if (symbol == nullptr && missing_.empty()) {
+            tellWhy();
+        }
+        function = reinterpret_cast<std::remove_reference_t<decltype(function)>>(symbol);
+    };
+    find(openSystem, "sd_bus_open_system");
+    find(closeUnref, "sd_bus_close_unref");
+    find(isReady, "sd_bus_is_ready");
+    find(process, "sd_bus_process");
+    find(wait, "sd_bus_wait");
+    find(call, "sd_bus_call");
+    find(newMethodCall, "sd_bus_message_new_method_call");
+    find(setAutoStart, "sd_bus_message_set_auto_start");
+    find(readBasic, "sd_bus_message_read_basic");
+    find(messageUnref, "sd_bus_message_unref");
+    find(errorHasName, "sd_bus_error_has_name");
+    find(errorFree, "sd_bus_error_free");
+}
+
+void SdBus::Close::operator()(void* handle) const noexcept {
+    ::dlclose(handle);
+}
+
+}  // namespace ZR::Live

@@ -1,0 +1,45 @@
+#pragma once
+
+#include <array>
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "clients/Lease.h"
+#include "formats/DhcpPacket.h"
+#include "formats/Roots.h"
+
+namespace ZR::Live {
+
+/// Where wicked keeps leases; the second while the first cannot be written.
+inline constexpr std::array<std::string_view, 2> wickedDirectories{"/var/lib/wicked",
+                                                                   "/run/wicked"};
+inline constexpr std::string_view wickedLeasePrefix = "lease-";
+
+/// One address of a wicked lease.
+struct WickedAddress {
+    std::string address;                    ///< canonical text
+    std::optional<std::int64_t> acquired;   ///< epoch seconds
+    std::optional<std::uint32_t> lifetime;  ///< seconds; UINT32_MAX: for ever
+
+    bool operator==(const WickedAddress&) const = default;
+};
+
+/// A lease file of wicked.
+struct WickedLease {
+    std::uint8_t family = 0;  ///< AF_INET or AF_INET6; 0 for neither
+    std::string type;         ///< "dhcp", "static", "auto", ...
+    std::string state;        ///< "granted" while it holds
+    std::string server;       ///< canonical text; of DHCPv6 the sender of the messages
+    std::vector<WickedAddress> addresses;
+
+    bool operator==(const WickedLease&) const = default;
+};
+[[nodiscard]] Parsed<WickedLease> parseWickedLease(std::string_view xml);
+
+/// Adds the leases of all known places. Needs the processes to be in the facts.
+void readWicked(const Roots& roots, ClientFacts& facts);
+
+}  // namespace ZR::Live

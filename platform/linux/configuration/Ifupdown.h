@@ -1,0 +1,45 @@
+#pragma once
+
+#include <string>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+#include "clients/Lease.h"
+#include "formats/Roots.h"
+
+namespace ZR::Live {
+
+inline constexpr std::string_view ifupdownDirectory = "/etc/network";
+inline constexpr std::string_view ifupdownFile = "interfaces";
+inline constexpr std::string_view ifupdownStateDirectory = "/run/network";
+inline constexpr std::string_view ifupdownStateFile = "ifstate";
+
+/// One stanza "iface NAME FAMILY METHOD" of interfaces(5).
+struct IfaceStanza {
+    std::string name;                    ///< a logical name; most often that of the interface
+    std::string family;                  ///< "inet", "inet6", ...
+    std::string method;                  ///< "dhcp", "static", "manual", "bootp", ...
+    std::vector<std::string> addresses;  ///< IPv4, canonical text
+    bool dhcp = false;                   ///< the option of inet6 auto: DHCPv6 as well
+
+    bool operator==(const IfaceStanza&) const = default;
+};
+
+/// A file of interfaces(5).
+struct InterfacesFile {
+    std::vector<IfaceStanza> stanzas;
+    std::vector<std::string> sources;      ///< patterns of further files
+    std::vector<std::string> directories;  ///< of further files
+
+    bool operator==(const InterfacesFile&) const = default;
+};
+[[nodiscard]] InterfacesFile parseInterfaces(std::string_view text);
+
+/// The lines PHYSICAL=LOGICAL of the interfaces that are up.
+[[nodiscard]] std::vector<std::pair<std::string, std::string>> parseIfstate(std::string_view text);
+
+/// Adds the configuration of each interface.
+void readIfupdown(const Roots& roots, ClientFacts& facts);
+
+}  // namespace ZR::Live

@@ -1,0 +1,40 @@
+#include "configuration/Netplan.h"
+
+#include <string>
+#include <utility>
+
+#include "clients/Networkd.h"
+#include "formats/Files.h"
+#include "kernel/Link.h"
+
+namespace ZR::Live {
+
+void readNetplan(const Roots& roots, ClientFacts& facts) {
+    const std::string directory = roots.path(netplanDirectory);
+    for (const std::string& name : listOptionalDirectory(directory, facts.complaints)) {
+        if (name.find("-netplan-") == std::string::npos || !name.ends_with(".network")) {
+            continue;
+        }
+        std::string path = pathIn(directory, name);
+        const auto text = readOptionalFile(path, facts.complaints);
+        if (!text) {
+            continue;
+        }
+        NetworkFile file;
+        applyNetworkFile(*text, file);
+        // Of a pattern only networkd can tell what it matches.
+        if (!isInterfaceName(file.matchName) ||
+            file.matchName.find_first_of("*?[!") != std::string::npos) {
+            continue;
+        }
+        facts.configurations.push_back({.client = Client::Netplan,
+                                        .interfaceName = std::move(file.matchName),
+                                        .dhcp4 = file.dhcp4,
+                                        .dhcp6 = file.dhcp6,
+                                        .staticAddresses = std::move(file.addresses),
+                                        .linkLocal4 = file.linkLocal4,
+                                        .origin = std::move(path)});
+    }
+}
+
+}  // namespace ZR::Live

@@ -1,0 +1,83 @@
+#pragma once
+
+#include <chrono>
+#include <cstdint>
+#include <map>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "ipmi/IpmiTransport.h"
+#include "ipmi/ServiceProcessor.h"
+
+namespace ZR::Live {
+
+/// Asks a service processor for its LAN channel and that channel's address and
+/// source of it. Never waits: every continue_() does what can be done at once.
+///
+/// As it may be looked after rarely, it asks in few rounds of many questions: all
+/// three of the channel where LAN is expected; if it is not there, for all other
+/// channels at once; then the two left about the one found.
+///
+/// It is given up after one second of waiting in all. Only time after which an
+/// answer was missed counts: one that has long come when somebody at last looks was
+/// not late.
+class IpmiConversation {
+  public:
+    using Time = std::chrono::steady_clock::time_point;
+    enum class State : std::uint8_t { Underway, Finished, Failed };
+
+    static constexpr std::chrono::seconds patience{1};
+    static constexpr std::uint8_t usualChannel = 1;
+
+    /// Sends the first questions. `transport` is open, and stays so as long as this;
+    /// `lastId` is the last number of a request on it, and is counted on.
+    IpmiConversation(IpmiTransport& transport, long& lastId, std::uint8_t expected, Time now);
+
+    /// Takes the answers that have come and asks on.
+    State continue_(Time now);
+
+    [[nodiscard]] State state() const noexcept { return state_; }
+
+    /// Once finished: the LAN channel, nullopt when there is none.
+    [[nodiscard]] const std::optional<LanChannel>& lan() const noexcept { return lan_; }
+
+    /// Once failed: why. Once finished: what was not answered as it should.
+    [[nodiscard]] const std::vector<std::string>& complaints() const noexcept {
+        return complaints_;
+    }
+
+  private:
+    enum class Round : std::uint8_t { Expected, Search, Found };
+    enum class Topic : std::uint8_t { Channel, Address, AddressSource };
+    struct Question {
+        Topic topic{};
+        std::uint8_t channel = 0;
+    };
+
+    void begin(Round round, Time now);
+    void ask(Topic topic, std::uint8_t channel);
+    void hear(const Question& question, const IpmiAnswer& answer);
+    void endRound(Time now);
+    void conclude(std::uint8_t channel);
+    void checkPatience(Time now);
+    void fail(const std::string& reason);
+
+    IpmiTransport& transport_;
+    long& lastId_;
+    State state_ = State::Underway;
+    Round round_ = Round::Expected;
+    std::map<long, Question> open_;                 // by the number of the request
+    Time begun_;                                    // when the questions of this round were sent
+    Time missed_;                                   // when some of their answers were last missed
+    std::chrono::steady_clock::duration waited_{};  // in earlier rounds
+    std::uint8_t channel_;                          // that is asked about, or was expected
+    std::map<std::uint8_t, std::uint8_t> lanChannels_;  // by the number asked for
+    std::optional<IpmiRefusal> passing_;  // why the channels that were heard may not be all
+    std::optional<IpmiDecoded<std::string>> address_;
+    std::optional<IpmiDecoded<std::uint8_t>> addressSource_;
+    std::optional<LanChannel> lan_;
+    std::vector<std::string> complaints_;
+};
+
+}  // namespace ZR::Live

@@ -1,0 +1,355 @@
+#include "kernel/ChangeMonitor.h"
+
+#include <linux/netlink.h>
+#include <linux/rtnetlink.h>
+#include <poll.h>
+#include <sys/inotify.h>
+#include <sys/socket.h>
+#include <sys/syscall.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <array>
+#include <cerrno>
+#include <cstddef>
+#include <cstring>
+#include <functional>
+#include <system_error>
+#include <utility>
+
+namespace ZR::Live {
+namespace {
+
+constexpr std::uint32_t selfEvents = IN_DELETE_SELF | IN_MOVE_SELF | IN_UNMOUNT;
+// IN_MODIFY: a client that keeps its lease file open appends without closing it.
+// IN_ATTRIB: a file may become readable.
+constexpr std::uint32_t directoryEvents = IN_MODIFY | IN_CREATE | IN_MOVED_TO | IN_MOVED_FROM |
+                                          IN_DELETE | IN_ATTRIB | IN_DELETE_SELF | IN_MOVE_SELF;
+constexpr std::uint32_t ancestorEvents = IN_CREATE | IN_MOVED_TO | IN_DELETE_SELF | IN_MOVE_SELF;
+
+// Ends a drain that others keep filling; what is left counts at the next question.
+constexpr int longestDrain = 4096;
+
+int addWatch(int fd, const std::string& directory, std::uint32_t events) {
+    // IN_MASK_ADD: two paths may be one directory, whose watch is then one too.
+    return ::inotify_add_watch(fd, directory.c_str(), events | IN_ONLYDIR | IN_MASK_ADD);
+}
+
+bool isAbsent(int error) {
+    return error == ENOENT || error == ENOTDIR;
+}
+
+std::string reasonOf(int error) {
+    return std::generic_category().message(error);
+}
+
+}  // namespace
+
+void ChangeMonitor::begin(const std::vector<WatchedPlace>& places,
+                          std::vector<std::string>& complaints) {
+    if (blind_) {
+        rearm_ = true;
+        blind_ = false;
+    }
+    openSubscription(complaints);
+    openWatches(complaints);
+    if (subscription_) {
+        drainSubscription();
+    }
+    if (watches_) {
+        // Before watching anew: what it tells may ask for that.
+        drainWatches();
+    }
+    if (watches_) {
+        if (rearm_ || places != places_) {
+            rearm_ = true;  // until all is done
+            watchAll(places, complaints);
+            rearm_ = false;
+        }
+    }
+    changed_ = false;
+}
+
+bool ChangeMonitor::changed() {
+    if (changed_ || blind_) {
+        return true;
+    }
+    asked_.clear();
+    asked_.push_back({.fd = subscription_.get(), .events = POLLIN, .revents = 0});
+    asked_.push_back({.fd = watches_.get(), .events = POLLIN, .revents = 0});
+    for (const auto& [pid, descriptor] : processes_) {
+        asked_.push_back({.fd = descriptor.get(), .events = POLLIN, .revents = 0});
+    }
+    const int ready = ::poll(asked_.data(), asked_.size(), 0);
+    if (ready == 0) {
+        return false;
+    }
+    if (ready < 0) {
+        changed_ = true;  // not even that can be known
+        return true;
+    }
+    if (asked_[0].revents != 0 && drainSubscription()) {
+        changed_ = true;
+    }
+    if (asked_[1].revents != 0 && drainWatches()) {
+        changed_ = true;
+    }
+    if (std::any_of(asked_.begin() + 2, asked_.end(),
+                    [](const pollfd& process) { return process.revents != 0; })) {
+        changed_ = true;
+    }
+    return changed_;
+}
+
+void ChangeMonitor::watchProcesses(std::span<const std::int32_t> pids) {
+    std::map<std::int32_t, UniqueFd> processes;
+    for (const std::int32_t pid : pids) {
+        if (const auto known = processes_.find(pid); known != processes_.end()) {
+            processes.insert(processes_.extract(known));
+            continue;
+        }
+        // The C library has a function for it only in its newer versions.
+        UniqueFd descriptor{static_cast<int>(::syscall(SYS_pidfd_open, pid, 0))};
+        if (descriptor) {
+            processes.emplace(pid, std::move(descriptor));
+        } else if (errno == ESRCH) {
+            changed_ = true;
+        }
+    }
+    processes_ = std::move(processes);
+}
+
+void ChangeMonitor::openSubscription(std::vector<std::string>& complaints) {
+    if (subscription_) {
+        return;
+    }
+    subscription_.reset(
+        ::socket(AF_NETLINK, SOCK_RAW | SOCK_NONBLOCK | SOCK_CLOEXEC, NETLINK_ROUTE));
+    sockaddr_nl address{};
+    address.nl_family = AF_NETLINK;
+    address.nl_groups = RTMGRP_LINK | RTMGRP_IPV4_IFADDR | RTMGRP_IPV6_IFADDR;
+    const auto* const generic = static_cast<const sockaddr*>(static_cast<const void*>(&address));
+    if (!subscription_ || ::bind(subscription_.get(), generic, sizeof address) != 0) {
+        complaints.push_back("cannot subscribe to network changes: " + reasonOf(errno));
+        subscription_.reset();
+        blind_ = true;
+    }
+}
+
+void ChangeMonitor::openWatches(std::vector<std::string>& complaints) {
+    if (watches_) {
+        return;
+    }
+    interests_.clear();
+    rearm_ = true;
+    watches_.reset(::inotify_init1(IN_NONBLOCK | IN_CLOEXEC));
+    if (!watches_) {
+        complaints.push_back("cannot watch files: " + reasonOf(errno));
+        blind_ = true;
+    }
+}
+
+/// What one round of watching has come to know. Many places lie in few directories, and
+/// below few that are missing: the kernel is asked once about each.
+struct ChangeMonitor::Arming {
+    struct Directory {
+        int watch = -1;
+        bool full = false;  // with all its events, else for newcomers only
+    };
+
+    Interests interests;
+    std::map<std::string, Directory, std::less<>> watched;
+    /// Missing directories, with the watch above them, which was there before they were
+    /// found missing: when they come, that is told.
+    std::map<std::string, int, std::less<>> missing;
+
+    /// Waits for the nearest missing directory on the way to this one, if one is known.
+    bool awaits(std::string_view directory) {
+        for (std::size_t end = directory.size(); end != 0 && end != std::string_view::npos;
+             end = directory.rfind('/', end - 1)) {
+            const std::string_view path = directory.substr(0, end);
+            const auto found = missing.find(path);
+            if (found != missing.end()) {
+                interests[found->second].push_back(
+                    {.name = std::string{path.substr(path.rfind('/') + 1)}, .ancestor = true});
+                return true;
+            }
+        }
+        return false;
+    }
+};
+
+void ChangeMonitor::watchAll(const std::vector<WatchedPlace>& places,
+                             std::vector<std::string>& complaints) {
+    Arming arming;
+    for (const WatchedPlace& place : places) {
+        watch(place, arming, complaints);
+    }
+    for (const auto& [watch, unused] : interests_) {
+        if (!arming.interests.contains(watch)) {
+            // Fails when the directory went meanwhile, and the watch with it.
+            static_cast<void>(::inotify_rm_watch(watches_.get(), watch));
+        }
+    }
+    interests_ = std::move(arming.interests);
+    places_ = places;
+}
+
+void ChangeMonitor::watch(const WatchedPlace& place, Arming& arming,
+                          std::vector<std::string>& complaints) {
+    const auto notice = [&](int watch) {
+        arming.interests[watch].push_back({.name = place.namePrefix, .ancestor = false});
+    };
+    if (const auto known = arming.watched.find(place.directory);
+        known != arming.watched.end() && known->second.full) {
+        notice(known->second.watch);
+        return;
+    }
+    // Directories may come and go meanwhile, but not for ever.
+    for (int attempt = 0; attempt < 8; ++attempt) {
+        if (arming.awaits(place.directory)) {
+            return;
+        }
+        const int directory = addWatch(watches_.get(), place.directory, directoryEvents);
+        if (directory >= 0) {
+            arming.watched[place.directory] = {.watch = directory, .full = true};
+            notice(directory);
+            return;
+        }
+        if (!isAbsent(errno) || watchAncestor(place.directory, arming) < 0) {
+            break;
+        }
+    }
+    const int error = errno;
+    if (error == EACCES) {
+        // A directory that may not be read holds nothing that was read either, and
+        // its reader says so.
+        return;
+    }
+    // Anything else, like a limit that was reached, leaves changes unnoticed.
+    complaints.push_back("cannot watch " + place.directory + ": " + reasonOf(error));
+    blind_ = true;
+}
+
+/// Watches the nearest existing ancestor of a directory that was just found missing. What
+/// is missing below it counts as such once it was not there with that watch begun. -1
+/// with errno set when there is nothing to watch.
+int ChangeMonitor::watchAncestor(std::string directory, Arming& arming) const {
+    const auto await = [&](const std::string& path) {
+        const int watch = addWatch(watches_.get(), path, ancestorEvents);
+        if (watch >= 0) {
+            arming.watched[path].watch = watch;
+            arming.interests[watch];  // kept, even if nothing is awaited there in the end
+        }
+        return watch;
+    };
+    while (directory.size() > 1) {
+        const std::size_t slash = directory.rfind('/');
+        if (slash == std::string::npos) {
+            break;
+        }
+        const std::string parent = directory.substr(0, std::max<std::size_t>(slash, 1));
+        if (const auto known = arming.watched.find(parent); known != arming.watched.end()) {
+            arming.missing.emplace(directory, known->second.watch);
+            return known->second.watch;
+        }
+        const int above = await(parent);
+        if (above >= 0) {
+            const int found = await(directory);
+            if (found < 0 && isAbsent(errno)) {
+                arming.missing.emplace(directory, above);
+                return above;
+            }
+            return found;
+        }
+        if (!isAbsent(errno)) {
+            return above;
+        }
+        directory = parent;
+    }
+    errno = ENOENT;
+    return -1;
+}
+
+bool ChangeMonitor::drainSubscription() {
+    bool happened = false;
+    for (int i = 0; i < longestDrain; ++i) {
+        // That something came is all that matters; one byte takes the whole message.
+        std::byte ignored{};
+        const ssize_t got = ::recv(subscription_.get(), &ignored, 1, MSG_DONTWAIT);
+        if (got >= 0 || errno == ENOBUFS) {
+            happened = true;  // ENOBUFS: more came than was kept
+        } else if (errno == EAGAIN) {
+            return happened;
+        } else if (errno != EINTR) {
+            subscription_.reset();
+            blind_ = true;
+            return true;
+        }
+    }
+    return true;
+}
+
+bool ChangeMonitor::drainWatches() {
+    bool happened = false;
+    alignas(inotify_event) std::array<char, 16384> buffer{};
+    for (int i = 0; i < longestDrain; ++i) {
+        const ssize_t got = ::read(watches_.get(), buffer.data(), buffer.size());
+        if (got <= 0) {
+            if (got < 0 && errno == EINTR) {
+                continue;
+            }
+            if (got == 0 || errno == EAGAIN) {
+                return happened;
+            }
+            watches_.reset();
+            blind_ = true;
+            return true;
+        }
+        std::string_view rest{buffer.data(), static_cast<std::size_t>(got)};
+        while (rest.size() >= sizeof(inotify_event)) {
+            inotify_event event{};
+            std::memcpy(&event, rest.data(), sizeof event);
+            rest.remove_prefix(sizeof event);
+            const std::string_view padded = rest.substr(0, event.len);
+            rest.remove_prefix(padded.size());
+            const std::string_view name = padded.substr(0, padded.find('\0'));
+            happened = concerns(event.wd, event.mask, name) || happened;
+        }
+    }
+    return true;
+}
+
+bool ChangeMonitor::concerns(int watch, std::uint32_t mask, std::string_view name) {
+    if ((mask & IN_Q_OVERFLOW) != 0) {
+        rearm_ = true;
+        return true;
+    }
+    const auto interests = interests_.find(watch);
+    if (interests == interests_.end()) {
+        return false;  // the last words of a watch that was given up
+    }
+    if ((mask & IN_IGNORED) != 0) {
+        interests_.erase(interests);
+        rearm_ = true;
+        return true;
+    }
+    if ((mask & selfEvents) != 0) {
+        rearm_ = true;
+        return true;
+    }
+    bool found = false;
+    for (const Interest& interest : interests->second) {
+        if (interest.ancestor) {
+            if (name == interest.name) {
+                rearm_ = true;
+                found = true;
+            }
+        } else if (name.empty() || name.starts_with(interest.name)) {
+            found = true;
+        }
+    }
+    return found;
+}
+
+}  // namespace ZR::Live

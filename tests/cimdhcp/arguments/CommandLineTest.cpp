@@ -1,0 +1,248 @@
+#include "arguments/CommandLine.h"
+
+#include <gtest/gtest.h>
+
+#include <cstdlib>
+
+#include "client/Failure.h"
+
+namespace cimdhcp {
+namespace {
+
+class CommandLineText : public ::testing::Test {
+  protected:
+    void SetUp() override {
+        for (const char* name :
+             {"CIMDHCP_SCHEMA_DIR", "CIMDHCP_REGISTRATION_DIR", "CIMDHCP_PROVIDER_DIR"}) {
+            ::unsetenv(name);
+        }
+    }
+
+    static CommandLine line(const std::vector<std::string>& arguments) {
+        return std::get<CommandLine>(readCommandLine(arguments));
+    }
+
+    static std::string information(const std::vector<std::string>& arguments) {
+        return std::get<Information>(readCommandLine(arguments)).text;
+    }
+
+    static std::string refusal(const std::vector<std::string>& arguments) {
+        try {
+            static_cast<void>(readCommandLine(arguments));
+            return "accepted";
+        } catch (const Failure& failure) {
+            EXPECT_EQ(failure.status(), ExitStatus::usage);
+            return failure.what();
+        }
+    }
+};
+
+TEST_F(CommandLineText, HasDefaults) {
+    EXPECT_EQ(line({"show"}), (CommandLine{Options{}, ShowCommand{}}));
+    EXPECT_EQ(line({"show"}).options.nameSpace, "root/cimv2");
+    EXPECT_EQ(line({"show"}).options.format, Format::table);
+}
+
+TEST_F(CommandLineText, TakesAllOptions) {
+    Options options;
+    options.tree = "t.json";
+    options.dataDir = "/data";
+    options.nameSpace = "root/other";
+    options.format = Format::json;
+    options.schemaDir = "/s";
+    options.registrationDir = "/r";
+    options.providerDir = "/p";
+    EXPECT_EQ(line({"--tree", "t.json", "--data-dir", "/data", "--namespace", "/root/other/",
+                    "--format", "json", "--schema-dir", "/s", "--registration-dir", "/r",
+                    "--provider-dir", "/p", "tree"}),
+              (CommandLine{options, TreeCommand{}}));
+}
+
+TEST_F(CommandLineText, TakesOptionsBehindTheCommand) {
+    EXPECT_EQ(line({"classes", "--format=json"}), line({"--format", "json", "classes"}));
+}
+
+TEST_F(CommandLineText, LooksForDirectoriesInTheEnvironment) {
+    ::setenv("CIMDHCP_SCHEMA_DIR", "/s", 1);
+    ::setenv("CIMDHCP_REGISTRATION_DIR", "/r", 1);
+    ::setenv("CIMDHCP_PROVIDER_DIR", "/p", 1);
+    const Options options = line({"show", "--provider-dir", "/mine"}).options;
+    EXPECT_EQ(options.schemaDir, "/s");
+    EXPECT_EQ(options.registrationDir, "/r");
+    EXPECT_EQ(options.providerDir, "/mine");
+}
+
+TEST_F(CommandLineText, TakesEachCommand) {
+    EXPECT_EQ(line({"classes"}).command, Command(ClassesCommand{}));
+    EXPECT_EQ(line({"names", "C"}).command, Command(NamesCommand{"C"}));
+    EXPECT_EQ(line({"instances", "C"}).command, Command(InstancesCommand{"C"}));
+    EXPECT_EQ(line({"get", "C.K=\"v\""}).command, Command(GetCommand{"C.K=\"v\""}));
+    EXPECT_EQ(line({"modify", "P", "A=1", "B={1, 2}", "C="}).command,
+              Command(ModifyCommand{"P", {"A=1", "B={1, 2}", "C="}}));
+    EXPECT_EQ(line({"rename", "eth0", "office"}).command,
+              Command(RenameCommand{"eth0", "office", false}));
+    EXPECT_EQ(line({"rename", "--create", "eth0", "office"}).command,
+              Command(RenameCommand{"eth0", "office", true}));
+    EXPECT_EQ(line({"associators", "P"}).command,
+              Command(AssociatorsCommand{"P", false, {}, {}, {}, {}}));
+    EXPECT_EQ(line({"associators", "P", "--names", "--assoc-class", "A", "--result-class", "R",
+                    "--role", "X", "--result-role", "Y"})
+                  .command,
+              Command(AssociatorsCommand{"P", true, "A", "R", "X", "Y"}));
+    EXPECT_EQ(line({"references", "P"}).command, Command(ReferencesCommand{"P", false, {}, {}}));
+    EXPECT_EQ(line({"references", "--names", "--result-class", "R", "--role", "X", "P"}).command,
+              Command(ReferencesCommand{"P", true, "R", "X"}));
+}
+
+TEST_F(CommandLineText, TakesArgumentsThatLookLikeCommandsOrOptions) {
+    EXPECT_EQ(line({"rename", "show", "tree"}).command,
+              Command(RenameCommand{"show", "tree", false}));
+    EXPECT_EQ(line({"rename", "eth0", "--", "--create"}).command,
+              Command(RenameCommand{"eth0", "--create", false}));
+    EXPECT_EQ(line({"rename", "eth0", ""}).command, Command(RenameCommand{"eth0", "", false}));
+    EXPECT_EQ(line({"rename", "eth0", "\"quoted\" 'name'"}).command,
+              Command(RenameCommand{"eth0", "\"quoted\" 'name'", false}));
+}
+
+TEST_F(CommandLineText, AnEmptyValueBehindAnEqualsSignIsNotTheNextArgument) {
+    EXPECT_EQ(refusal({"--tree=", "show"}), "--tree needs a name");
+    EXPECT_EQ(line({"--provider-dir=", "show"}).options.providerDir, "");
+    EXPECT_EQ(std::get<AssociatorsCommand>(line({"associators", "--role=", "P"}).command).role, "");
+    EXPECT_EQ(std::get<GetCommand>(line({"get", "--", "--tree="}).command).path, "--tree=");
+}
+
+TEST_F(CommandLineText, ReadsTheCommandsOfTheServer) {
+    EXPECT_EQ(line({"serve"}).command, Command(ServeCommand()));
+    ServeCommand serve;
+    serve.listen = "0.0.0.0:5989";
+    serve.tlsCertificate = "c";
+    serve.tlsKey = "k";
+    serve.users = "u";
+    serve.readOnly = true;
+    serve.limits.body = 5;
+    serve.limits.request = std::chrono::seconds(7);
+    serve.limits.sessions.sessions = 9;
+    EXPECT_EQ(line({"serve", "--listen", "0.0.0.0:5989", "--tls-cert", "c", "--tls-key", "k",
+                    "--users", "u", "--read-only", "--max-body", "5", "--request-timeout", "7",
+                    "--max-enumerations", "9"})
+                  .command,
+              Command(serve));
+    EXPECT_EQ(line({"user", "add", "--users", "f", "ada"}).command,
+              Command(UserAddCommand{"ada", "f", false}));
+    EXPECT_EQ(line({"user", "add", "--modify", "--users", "f", "ada"}).command,
+              Command(UserAddCommand{"ada", "f", true}));
+    EXPECT_EQ(line({"check"}).command, Command(CheckCommand()));
+}
+
+TEST_F(CommandLineText, OneLineLeavesNothingToTheNext) {
+    CommandLineReader reader;
+    const auto read = [&reader](const std::vector<std::string>& arguments) {
+        return std::get<CommandLine>(reader.read(arguments));
+    };
+    EXPECT_EQ(read({"--connect", "a", "--no-header", "rename", "e", "n"}).options.connect,
+              std::vector<std::string>{"a"});
+    EXPECT_EQ(read({"rename", "eth0", "office"}), line({"rename", "eth0", "office"}));
+    EXPECT_EQ(read({"serve", "--max-body", "5"}), line({"serve", "--max-body", "5"}));
+    EXPECT_EQ(read({"serve"}), line({"serve"}));
+    EXPECT_THROW(static_cast<void>(reader.read({"--data-dir", "d", "--count", "modify", "P"})),
+                 Failure);
+    EXPECT_EQ(std::get<Information>(reader.read({"names", "--help"})).text,
+              information({"names", "--help"}));
+    EXPECT_EQ(read({"modify", "P", "a=1", "b=2"}), line({"modify", "P", "a=1", "b=2"}));
+    EXPECT_EQ(read({"show"}), line({"show"}));
+}
+
+TEST_F(CommandLineText, ATreeMayBeExplained) {
+    EXPECT_EQ(line({"tree"}).command, Command(TreeCommand{false}));
+    EXPECT_EQ(line({"tree", "--explain"}).command, Command(TreeCommand{true}));
+}
+
+TEST_F(CommandLineText, TellsWhatIsWrong) {
+    const std::string hint = " (\"cimdhcp --help\" tells more)";
+    EXPECT_EQ(refusal({}), "a command is missing" + hint);
+    EXPECT_EQ(refusal({"server"}), "there is no command \"server\"" + hint);
+    EXPECT_NE(refusal({"user"}), "accepted");
+    EXPECT_NE(refusal({"user", "add", "ada"}), "accepted");
+    EXPECT_NE(refusal({"serve", "--max-body", "-1"}), "accepted");
+    EXPECT_EQ(refusal({"serve", "--max-body", "0"}), "--max-body is 0; it may be 1 to 1073741824");
+    EXPECT_NE(refusal({"serve", "--request-timeout", "x"}), "accepted");
+    EXPECT_EQ(refusal({"show", "eth0"}), "The following argument was not expected: eth0" + hint);
+    EXPECT_EQ(refusal({"--nothing", "x", "show"}).substr(0, 37),
+              "The following arguments were not expe");
+    EXPECT_EQ(refusal({"rename", "eth0"}), "NAME is required" + hint);
+    EXPECT_EQ(refusal({"modify", "P"}), "PROPERTY=VALUE is required" + hint);
+    EXPECT_EQ(refusal({"--format", "xml", "show"}),
+              "--format: there is no format \"xml\", only table, mof and json" + hint);
+    EXPECT_EQ(refusal({"references", "P", "--assoc-class", "A"}).substr(0, 30),
+              "The following arguments were n");
+    EXPECT_EQ(refusal({"--namespace", "/", "show"}),
+              "--namespace needs a name, such as root/cimv2");
+    EXPECT_EQ(refusal({"--tree", "", "show"}), "--tree needs a name");
+    EXPECT_EQ(refusal({"--data-dir", "", "show"}), "--data-dir needs a name");
+}
+
+TEST_F(CommandLineText, HasMofForInstancesAlone) {
+    const std::string refused = "this command has no MOF output; use --format table or json";
+    for (const auto& command : std::vector<std::vector<std::string>>{
+             {"show"}, {"classes"}, {"tree"}, {"rename", "eth0", "x"}, {"serve"}, {"check"}}) {
+        auto arguments = command;
+        arguments.insert(arguments.begin(), {"--format", "mof"});
+        EXPECT_EQ(refusal(arguments), refused) << command.front();
+    }
+    EXPECT_EQ(line({"--format", "mof", "names", "C"}).options.format, Format::mof);
+}
+
+TEST_F(CommandLineText, HelpNamesEveryCommandAndOption) {
+    const std::string help = information({"--help"});
+    for (const char* text : {"show ",
+                             "rename INTERFACE NAME",
+                             "tree ",
+                             "classes ",
+                             "names CLASS",
+                             "instances CLASS",
+                             "get PATH",
+                             "modify PATH PROPERTY=VALUE...",
+                             "associators PATH",
+                             "references PATH",
+                             "serve ",
+                             "check ",
+                             "user ",
+                             "--tree FILE",
+                             "--data-dir DIR",
+                             "--namespace NS",
+                             "--format FORMAT",
+                             "--connect URL",
+                             "--hosts FILE",
+                             "--parallel N",
+                             "--timeout SECONDS",
+                             "--credentials FILE",
+                             "--cacert FILE",
+                             "--insecure",
+                             "--no-header",
+                             "--sort COLUMN",
+                             "--count",
+                             "--time",
+                             "--color WHEN",
+                             "--schema-dir DIR",
+                             "--registration-dir DIR",
+                             "--provider-dir DIR",
+                             "CIMDHCP_SCHEMA_DIR",
+                             "Exit status:",
+                             "Examples:"}) {
+        EXPECT_NE(help.find(text), std::string::npos) << text;
+    }
+    EXPECT_EQ(information({"-h"}), help);
+}
+
+TEST_F(CommandLineText, HelpOfACommandNamesItsOptions) {
+    const std::string help = information({"associators", "--help"});
+    EXPECT_EQ(help.substr(0, help.find('\n')), "Usage: cimdhcp associators [OPTIONS] PATH");
+    for (const char* text : {"--names", "--assoc-class CLASS", "--result-class CLASS",
+                             "--role PROPERTY", "--result-role PROPERTY"}) {
+        EXPECT_NE(help.find(text), std::string::npos) << text;
+    }
+    EXPECT_EQ(information({"references", "--help"}).find("--assoc-class"), std::string::npos);
+}
+
+}  // namespace
+}  // namespace cimdhcp

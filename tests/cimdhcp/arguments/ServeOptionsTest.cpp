@@ -1,0 +1,72 @@
+#include "arguments/ServeOptions.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+
+namespace cimdhcp {
+namespace {
+
+/// What the options read into a command that had its defaults.
+ServeCommand read(std::vector<std::string> arguments) {
+    CLI::App app;
+    ServeCommand serve;
+    addServeOptions(app, serve);
+    // The parser takes them from the end.
+    std::reverse(arguments.begin(), arguments.end());
+    app.parse(arguments);
+    return serve;
+}
+
+TEST(ServeOptions, LeaveTheDefaultsAlone) {
+    EXPECT_EQ(read({}), ServeCommand());
+}
+
+TEST(ServeOptions, SayWhereToListenAndWhoMayAsk) {
+    ServeCommand serve;
+    serve.listen = "[::1]:5989";
+    serve.tlsCertificate = "c";
+    serve.tlsKey = "k";
+    serve.users = "u";
+    serve.readOnly = true;
+    EXPECT_EQ(read({"--listen", "[::1]:5989", "--tls-cert", "c", "--tls-key", "k", "--users", "u",
+                    "--read-only"}),
+              serve);
+}
+
+TEST(ServeOptions, EachLimitIsItsOwn) {
+    ServeCommand serve;
+    serve.limits.headerLine = 1;
+    serve.limits.headers = 2;
+    serve.limits.body = 3;
+    serve.limits.depth = 4;
+    serve.limits.connections = 5;
+    serve.limits.waiting = 6;
+    serve.limits.sessions.sessions = 7;
+    serve.limits.result = 8;
+    serve.limits.workers = 9;
+    serve.limits.stuck = 10;
+    serve.limits.ioThreads = 11;
+    serve.limits.request = std::chrono::seconds(12);
+    serve.limits.answer = std::chrono::seconds(13);
+    serve.limits.sessions.defaultTimeout = std::chrono::seconds(14);
+    serve.limits.sessions.longestTimeout = std::chrono::seconds(15);
+    std::vector<std::string> arguments;
+    for (const char* option :
+         {"--max-header-line", "--max-headers", "--max-body", "--max-depth", "--max-connections",
+          "--max-waiting", "--max-enumerations", "--max-result", "--workers", "--max-stuck",
+          "--io-threads", "--request-timeout", "--answer-timeout", "--enumeration-timeout",
+          "--max-enumeration-timeout"}) {
+        arguments.emplace_back(option);
+        arguments.push_back(std::to_string(arguments.size() / 2 + 1));
+    }
+    EXPECT_EQ(read(arguments), serve);
+}
+
+TEST(ServeOptions, RefuseWhatIsNoNumber) {
+    EXPECT_THROW(static_cast<void>(read({"--max-body", "much"})), CLI::ParseError);
+    EXPECT_THROW(static_cast<void>(read({"--answer-timeout", "x"})), CLI::ParseError);
+}
+
+}  // namespace
+}  // namespace cimdhcp

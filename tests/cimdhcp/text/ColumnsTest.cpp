@@ -1,0 +1,37 @@
+#include "text/Columns.h"
+
+#include <gtest/gtest.h>
+
+#include "client/Failure.h"
+
+namespace cimdhcp {
+namespace {
+
+struct Row {
+    std::string name;
+    int size = 0;
+};
+
+const std::vector<Column<Row>> columns{
+    {"NAME", [](const Row& row) { return row.name; }},
+    {"SIZE", [](const Row& row) { return std::to_string(row.size); }}};
+
+TEST(Columns, MakeATable) {
+    EXPECT_EQ(tableOf(columns, std::vector<Row>{{"a", 10}, {"b", 9}}).text(std::nullopt),
+              "NAME  SIZE\n"
+              "a     10\n"
+              "b     9\n");
+}
+
+TEST(Columns, SortByWhatTheyShow) {
+    std::vector<Row> rows{{"b", 10}, {"a", 9}, {"c", 10}};
+    sortBy("size", columns, rows);
+    EXPECT_EQ(tableOf(columns, rows).text(std::nullopt, {false, false}),
+              "a  9\n"
+              "b  10\n"
+              "c  10\n");
+    EXPECT_THROW(sortBy("other", columns, rows), Failure);
+}
+
+}  // namespace
+}  // namespace cimdhcp

@@ -1,0 +1,170 @@
+#include "broker/objects/BrokerInstance.h"
+
+#include "kit/BrokerFixture.h"
+
+namespace cimom::test {
+namespace {
+
+class BrokerInstance : public TestBroker {
+  protected:
+    const CMPIInstance* const instance = mb->eft->newInstance(mb, newPath("Test_Types"), nullptr);
+
+    CMPIrc set(const char* name, CMPIType type) const {
+        const CMPIValue value{};
+        return instance->ft->setProperty(instance, name, &value, type).rc;
+    }
+};
+
+TEST_F(BrokerInstance, DeclaredPropertyTakesItsTypeOnly) {
+    EXPECT_EQ(set("Uint16", CMPI_uint16), CMPI_RC_OK);
+    EXPECT_EQ(set("Uint16", CMPI_uint8), CMPI_RC_ERR_TYPE_MISMATCH);
+    EXPECT_EQ(set("Uint16", CMPI_sint16), CMPI_RC_ERR_TYPE_MISMATCH);
+    EXPECT_EQ(set("Uint16", CMPI_uint16A), CMPI_RC_ERR_TYPE_MISMATCH);
+    EXPECT_EQ(set("Uint16A", CMPI_uint16), CMPI_RC_ERR_TYPE_MISMATCH);
+    EXPECT_EQ(set("DateTime", CMPI_string), CMPI_RC_ERR_TYPE_MISMATCH);
+    EXPECT_EQ(set("String", CMPI_instance), CMPI_RC_ERR_TYPE_MISMATCH);
+    EXPECT_EQ(set("Embedded", CMPI_instance), CMPI_RC_OK);
+    EXPECT_EQ(set("Embedded", CMPI_string), CMPI_RC_OK);
+}
+
+TEST_F(BrokerInstance, UndeclaredPropertyTakesAnyCimType) {
+    EXPECT_EQ(set("Mine", CMPI_sint64), CMPI_RC_OK);
+    EXPECT_EQ(set("Mine", CMPI_ptr), CMPI_RC_ERR_TYPE_MISMATCH);
+    EXPECT_EQ(set("Mine", CMPI_args), CMPI_RC_ERR_TYPE_MISMATCH);
+}
+
+TEST_F(BrokerInstance, NullWithoutTypeGetsTheDeclaredOne) {
+    ASSERT_EQ(instance->ft->setProperty(instance, "Uint32A", nullptr, CMPI_null).rc, CMPI_RC_OK);
+    const CMPIData data = instance->ft->getProperty(instance, "Uint32A", nullptr);
+    EXPECT_EQ(data.type, CMPI_uint32A);
+    EXPECT_EQ(data.state, CMPI_nullValue);
+}
+
+TEST_F(BrokerInstance, NullPointersInsideOfValuesAreNull) {
+    for (const auto& [name, type] :
+         {std::pair{"String", CMPI_string}, std::pair{"DateTime", CMPI_dateTime},
+          std::pair{"StringA", CMPI_stringA}, std::pair{"Embedded", CMPI_instance},
+          std::pair{"Reference", CMPI_ref}}) {
+        ASSERT_EQ(set(name, type), CMPI_RC_OK) << name;
+        EXPECT_EQ(instance->ft->getProperty(instance, name, nullptr).state, CMPI_nullValue) << name;
+    }
+}
+
+TEST_F(BrokerInstance, ArrayMustHoldTheTypeThatIsNamed) {
+    CMPIValue value{};
+    value.array = mb->eft->newArray(mb, 1, CMPI_uint8, nullptr);
+    EXPECT_EQ(instance->ft->setProperty(instance, "Uint16A", &value, CMPI_uint16A).rc,
+              CMPI_RC_ERR_TYPE_MISMATCH);
+    EXPECT_EQ(instance->ft->setProperty(instance, "Uint8A", &value, CMPI_uint8A).rc, CMPI_RC_OK);
+}
+
+TEST_F(BrokerInstance, LaterChangesOfAnArrayAreNotSeen) {
+    CMPIValue value{};
+    value.array = mb->eft->newArray(mb, 1, CMPI_uint8, nullptr);
+    instance->ft->setProperty(instance, "Uint8A", &value, CMPI_uint8A);
+    CMPIValue number{};
+    number.uint8 = 9;
+    value.array->ft->setElementAt(value.array, 0, &number, CMPI_uint8);
+    const CMPIArray* const kept =
+        instance->ft->getProperty(instance, "Uint8A", nullptr).value.array;
+    EXPECT_EQ(kept->ft->getElementAt(kept, 0, nullptr).state, CMPI_nullValue);
+}
+
+TEST_F(BrokerInstance, BooleansAreZeroOrOne) {
+    CMPIValue value{};
+    value.boolean = 17;
+    instance->ft->setProperty(instance, "Boolean", &value, CMPI_boolean);
+    EXPECT_EQ(instance->ft->getProperty(instance, "Boolean", nullptr).value.boolean, 1);
+}
+
+TEST_F(BrokerInstance, ReadsNoMoreThanTheValueOfItsType) {
+    // As C code passes it; the address sanitizer watches the bytes behind.
+    const auto number = std::make_unique<CMPIUint16>(CMPIUint16{513});
+    ASSERT_EQ(instance->ft
+                  ->setProperty(instance, "Uint16",
+                                reinterpret_cast<const CMPIValue*>(number.get()), CMPI_uint16)
+                  .rc,
+              CMPI_RC_OK);
+    EXPECT_EQ(instance->ft->getProperty(instance, "Uint16", nullptr).value.uint16, 513);
+}
+
+TEST_F(BrokerInstance, CharsArePassedAsTheTextPointerItself) {
+    char buffer[] = "buffer";
+    ASSERT_EQ(instance->ft
+                  ->setProperty(instance, "String", reinterpret_cast<const CMPIValue*>(buffer),
+                                CMPI_chars)
+                  .rc,
+              CMPI_RC_OK);
+    buffer[0] = 'X';
+    const CMPIData data = instance->ft->getProperty(instance, "String", nullptr);
+    EXPECT_EQ(data.type, CMPI_string);
+    EXPECT_EQ(text(data.value.string), "buffer");
+}
+
+TEST_F(BrokerInstance, PathIsHandedOutAgainWhileNobodyChangesIt) {
+    CMPIObjectPath* const first = instance->ft->getObjectPath(instance, nullptr);
+    EXPECT_EQ(instance->ft->getObjectPath(instance, nullptr), first);
+    first->ft->setClassName(first, "Other");
+    CMPIObjectPath* const second = instance->ft->getObjectPath(instance, nullptr);
+    EXPECT_NE(second, first);
+    EXPECT_EQ(text(second->ft->getClassName(second, nullptr)), "Test_Types");
+}
+
+TEST_F(BrokerInstance, EmptyFilterDropsEverything) {
+    set("Uint16", CMPI_uint16);
+    const char* nothing[] = {nullptr};
+    instance->ft->setPropertyFilter(instance, nothing, nullptr);
+    EXPECT_EQ(instance->ft->getPropertyCount(instance, nullptr), 0U);
+    EXPECT_EQ(set("Uint16", CMPI_uint16), CMPI_RC_OK);
+    EXPECT_EQ(instance->ft->getPropertyCount(instance, nullptr), 0U);
+    instance->ft->setPropertyFilter(instance, nullptr, nullptr);
+    set("Uint16", CMPI_uint16);
+    EXPECT_EQ(instance->ft->getPropertyCount(instance, nullptr), 1U);
+}
+
+TEST_F(BrokerInstance, CloneWithEverythingOutlivesTheRequest) {
+    CMPIInstance* clone = nullptr;
+    {
+        const broker::RequestScope request;
+        const CMPIInstance* const made = mb->eft->newInstance(mb, newPath("Test_Types"), nullptr);
+        CMPIValue value = valueOf(newString("kept"));
+        made->ft->setProperty(made, "String", &value, CMPI_string);
+        value.dateTime = mb->eft->newDateTimeFromBinary(mb, 1, 1, nullptr);
+        made->ft->setProperty(made, "Interval", &value, CMPI_dateTime);
+        value.inst = mb->eft->newInstance(mb, newPath("Test_Inner"), nullptr);
+        made->ft->setProperty(made, "Embedded", &value, CMPI_instance);
+        value.array = mb->eft->newArray(mb, 2, CMPI_string, nullptr);
+        made->ft->setProperty(made, "StringA", &value, CMPI_stringA);
+        clone = made->ft->clone(made, nullptr);
+    }
+    EXPECT_EQ(text(clone->ft->getProperty(clone, "String", nullptr).value.string), "kept");
+    const CMPIDateTime* const time =
+        clone->ft->getProperty(clone, "Interval", nullptr).value.dateTime;
+    EXPECT_EQ(time->ft->getBinaryFormat(time, nullptr), 1U);
+    const CMPIInstance* const inner = clone->ft->getProperty(clone, "Embedded", nullptr).value.inst;
+    const CMPIObjectPath* const path = inner->ft->getObjectPath(inner, nullptr);
+    EXPECT_EQ(text(path->ft->getClassName(path, nullptr)), "Test_Inner");
+    const CMPIValue more = valueOf(newString("more"));
+    EXPECT_EQ(clone->ft->setProperty(clone, "Note", &more, CMPI_string).rc, CMPI_RC_OK);
+    EXPECT_EQ(clone->ft->release(clone).rc, CMPI_RC_OK);
+}
+
+TEST_F(BrokerInstance, SameNameInAnyCaseIsOneProperty) {
+    for (const char* const name : {"Mine", "MINE", "mine"}) {
+        set(name, CMPI_uint8);
+    }
+    EXPECT_EQ(instance->ft->getPropertyCount(instance, nullptr), 1U);
+}
+
+TEST_F(BrokerInstance, ManyPropertiesKeepTheirOrder) {
+    for (int number = 0; number < 200; ++number) {
+        set(("Property" + std::to_string(number)).c_str(), CMPI_uint8);
+    }
+    ASSERT_EQ(instance->ft->getPropertyCount(instance, nullptr), 200U);
+    CMPIString* name = nullptr;
+    instance->ft->getPropertyAt(instance, 123, &name, nullptr);
+    EXPECT_EQ(text(name), "Property123");
+}
+
+}  // namespace
+}  // namespace cimom::test

@@ -1,0 +1,162 @@
+#include "kit/TestManager.h"
+
+namespace cimom::test {
+namespace {
+
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+class AssociationRequests : public TestManager {
+  protected:
+    const ObjectPath l1 = path("Test_Left.Id=\"l1\"");
+    const ObjectPath r1 = path("Test_Right.Id=\"r1\"");
+
+    std::vector<std::string> far(const ObjectPath& from, const AssociationRequest& request) {
+        const PathsResult paths = manager.associatorNames(from, request);
+        const InstancesResult instances = manager.associators(from, request);
+        EXPECT_EQ(paths.status, Status{});
+        EXPECT_EQ(instances.status, Status{});
+        EXPECT_EQ(names(paths.paths), names(instances.instances));
+        return names(paths.paths);
+    }
+    std::vector<std::string> links(const ObjectPath& from, const AssociationRequest& request) {
+        const PathsResult paths = manager.referenceNames(from, request);
+        const InstancesResult instances = manager.references(from, request);
+        EXPECT_EQ(paths.status, Status{});
+        EXPECT_EQ(instances.status, Status{});
+        EXPECT_EQ(names(paths.paths), names(instances.instances));
+        std::vector<std::string> short_;
+        for (const auto& one : paths.paths) {
+            const auto id = [&one](const char* role) {
+                return textOf(referenceOf(one->key(role)).key("Id"));
+            };
+            short_.push_back(one->className.substr(5) + " " + id("Near") + " " + id("Far"));
+        }
+        return short_;
+    }
+
+    static AssociationRequest request(std::optional<std::string> assocClass,
+                                      std::optional<std::string> resultClass,
+                                      std::optional<std::string> role,
+                                      std::optional<std::string> resultRole) {
+        return {std::move(assocClass), std::move(resultClass), std::move(role),
+                std::move(resultRole), std::nullopt,           ""};
+    }
+    static constexpr std::nullopt_t none = std::nullopt;
+};
+
+TEST_F(AssociationRequests, ProviderIsAskedOnceForAllItsAssociations) {
+    const InstancesResult result = manager.associators(l1);
+    EXPECT_EQ(result.status, Status{});
+    EXPECT_THAT(names(result.instances),
+                ElementsAre("Test_Right.Id=\"r1\"", "Test_RightSpecial.Id=\"s1\""));
+    EXPECT_EQ(takeLog(), "associators Test_Left null null null null\n");
+}
+
+TEST_F(AssociationRequests, ClassesReachTheProviderInTheirCanonicalCase) {
+    manager.associatorNames(path("test_left.Id=\"l1\""),
+                            request("test_LINKA", "test_left", "near", none));
+    EXPECT_THAT(takeLog(),
+                testing::StartsWith("associatorNames Test_Left Test_LinkA Test_Left near null\n"));
+}
+
+TEST_F(AssociationRequests, ParentAsResultClassIsFilteredAndNotPassed) {
+    EXPECT_THAT(far(l1, request(none, "Test_Right", none, none)),
+                ElementsAre("Test_Right.Id=\"r1\"", "Test_RightSpecial.Id=\"s1\""));
+    EXPECT_THAT(takeLog(), testing::StartsWith("associatorNames Test_Left null null null null\n"));
+    EXPECT_THAT(far(l1, request(none, "Test_RightSpecial", none, none)),
+                ElementsAre("Test_RightSpecial.Id=\"s1\""));
+    EXPECT_THAT(far(l1, request(none, "Test_Left", none, none)), IsEmpty());
+    EXPECT_THAT(far(l1, request(none, "Nobody_Knows", none, none)), IsEmpty());
+}
+
+TEST_F(AssociationRequests, AssociationClassIsTheProvidersMatter) {
+    EXPECT_THAT(far(l1, request("Test_LinkB", none, none, none)),
+                ElementsAre("Test_RightSpecial.Id=\"s1\""));
+    EXPECT_THAT(far(l1, request("Test_Link", none, none, none)),
+                ElementsAre("Test_Right.Id=\"r1\"", "Test_RightSpecial.Id=\"s1\""));
+}
+
+TEST_F(AssociationRequests, UnknownAssociationClassIsAnsweredByTheProvider) {
+    const AssociationRequest unknown = request("Nobody_Knows", none, none, none);
+    EXPECT_EQ(manager.associators(l1, unknown).status.code, CMPI_RC_ERR_INVALID_CLASS);
+    const PathsResult paths = manager.associatorNames(l1, unknown);
+    EXPECT_EQ(paths.status, Status{});
+    EXPECT_TRUE(paths.paths.empty());
+}
+
+TEST_F(AssociationRequests, RoleKeepsAssociationsInWhichTheSourcePlaysIt) {
+    // r1 is the far end of l1 and l2 and the near end of another link to l2.
+    EXPECT_THAT(far(r1, {}),
+                ElementsAre("Test_Left.Id=\"l1\"", "Test_Left.Id=\"l2\"", "Test_Left.Id=\"l2\""));
+    EXPECT_THAT(far(r1, request("Test_LinkA", none, "Near", none)),
+                ElementsAre("Test_Left.Id=\"l2\""));
+    EXPECT_THAT(far(r1, request("Test_LinkA", none, "FAR", none)),
+                ElementsAre("Test_Left.Id=\"l1\""));
+    EXPECT_THAT(far(r1, request(none, none, "Middle", none)), IsEmpty());
+}
+
+TEST_F(AssociationRequests, ResultRoleKeepsFarEndsThatPlayIt) {
+    EXPECT_THAT(far(r1, request("Test_LinkA", none, none, "Far")),
+                ElementsAre("Test_Left.Id=\"l2\""));
+    EXPECT_THAT(far(r1, request("Test_LinkA", none, "Near", "Far")),
+                ElementsAre("Test_Left.Id=\"l2\""));
+    EXPECT_THAT(far(r1, request("Test_LinkA", none, "Near", "Near")), IsEmpty());
+}
+
+TEST_F(AssociationRequests, ReferencesWithoutClassAskForEachServedAssociationClass) {
+    EXPECT_THAT(links(l1, {}), ElementsAre("LinkA l1 r1", "LinkB l1 s1"));
+    EXPECT_EQ(takeLog(),
+              "referenceNames Test_Left Test_LinkA\nreferenceNames Test_Left Test_LinkB\n"
+              "references Test_Left Test_LinkA\nreferences Test_Left Test_LinkB\n");
+}
+
+TEST_F(AssociationRequests, ReferencesOfAParentClassAreThoseOfItsSubclasses) {
+    EXPECT_THAT(links(l1, request(none, "TEST_link", none, none)),
+                ElementsAre("LinkA l1 r1", "LinkB l1 s1"));
+    EXPECT_THAT(links(l1, request(none, "Test_LinkB", none, none)), ElementsAre("LinkB l1 s1"));
+    EXPECT_THAT(links(l1, request(none, "Test_Base", none, none)), IsEmpty());
+}
+
+TEST_F(AssociationRequests, ReferencesOfAnUnknownClassAreRefusedByTheProvider) {
+    EXPECT_EQ(manager.referenceNames(l1, request(none, "Nobody_Knows", none, none)).status.code,
+              CMPI_RC_ERR_INVALID_CLASS);
+}
+
+TEST_F(AssociationRequests, ReferencesAreFilteredByRole) {
+    EXPECT_THAT(links(r1, request(none, none, "near", none)), ElementsAre("LinkA r1 l2"));
+    EXPECT_THAT(links(r1, request(none, none, "Far", none)),
+                ElementsAre("LinkA l1 r1", "LinkB l2 r1"));
+}
+
+TEST_F(AssociationRequests, PropertyListLimitsInstances) {
+    AssociationRequest limited;
+    limited.propertyList = {"Note"};
+    for (const auto& instance : manager.associators(l1, limited).instances) {
+        EXPECT_EQ(instance->properties.size(), 1U);
+        EXPECT_NE(instance->path.key("Id"), nullptr);
+    }
+    limited.propertyList = std::vector<std::string>{};
+    for (const auto& instance : manager.references(l1, limited).instances) {
+        EXPECT_TRUE(instance->properties.empty());
+        EXPECT_EQ(instance->path.keys.size(), 2U);
+        EXPECT_EQ(instance->path.host, "testhost");
+    }
+}
+
+TEST_F(AssociationRequests, UnknownObjectClassOrNamespaceIsTold) {
+    EXPECT_EQ(manager.associators(path("Nobody_Knows.Id=\"1\"")).status.code,
+              CMPI_RC_ERR_INVALID_CLASS);
+    EXPECT_EQ(manager.references(parseObjectPath("x:Test_Left.Id=\"l1\"")).status.code,
+              CMPI_RC_ERR_INVALID_NAMESPACE);
+}
+
+TEST_F(AssociationRequests, NamespaceWithoutAssociationsHasNone) {
+    const InstancesResult result =
+        manager.associators(parseObjectPath("root/other:Test_Left.Id=\"l1\""));
+    EXPECT_EQ(result.status, Status{});
+    EXPECT_TRUE(result.instances.empty());
+}
+
+}  // namespace
+}  // namespace cimom::test

@@ -1,0 +1,315 @@
+#include "kit/StrictHost.h"
+
+#include <dlfcn.h>
+#include <gtest/gtest.h>
+
+#include <exception>
+#include <utility>
+
+#include "kit/StrictBroker.h"
+
+namespace strict {
+
+namespace {
+
+using Kind = ResultObject::Kind;
+
+cimom::ClassRepository loadSchema(const std::string& directory) {
+    cimom::ClassRepository repository;
+    repository.loadDirectory(directory);
+    repository.complete();
+    return repository;
+}
+
+std::vector<cimom::Registration> readAll(const std::vector<std::string>& files) {
+    std::vector<cimom::Registration> all;
+    for (const std::string& file : files) {
+        const auto read = cimom::readRegistrations(file);
+        all.insert(all.end(), read.begin(), read.end());
+    }
+    return all;
+}
+
+/// A provider's function; null and exceptions end a real object manager.
+template <typename Slot, typename... Arguments>
+CMPIStatus callSlot(const char* name, Slot slot, Arguments... arguments) {
+    if (slot == nullptr) {
+        violations().add(std::string("The provider's table has no ") + name);
+        return {CMPI_RC_ERR_FAILED, nullptr};
+    }
+    try {
+        return slot(arguments...);
+    } catch (const std::exception& exception) {
+        violations().add(std::string(name) + " threw: " + exception.what());
+    }
+    return {CMPI_RC_ERR_FAILED, nullptr};
+}
+
+void append(StrictHost::Answer& all, StrictHost::Answer one) {
+    // The first error is the answer, and what was delivered before it is discarded.
+    if (all.code != CMPI_RC_OK || one.code != CMPI_RC_OK) {
+        all = {all.code == CMPI_RC_OK ? one.code : all.code, {}, {}};
+        return;
+    }
+    all.paths.insert(all.paths.end(), one.paths.begin(), one.paths.end());
+    all.instances.insert(all.instances.end(), one.instances.begin(), one.instances.end());
+}
+
+}  // namespace
+
+StrictHost::StrictHost(const std::string& schemaDirectory,
+                       const std::vector<std::string>& registrations, std::string libraryDirectory,
+                       Binding binding, Contexts contexts)
+    : repository_(loadSchema(schemaDirectory)),
+      registrations_(readAll(registrations)),
+      directory_(std::move(libraryDirectory)),
+      flags_(RTLD_GLOBAL | (binding == Binding::now ? RTLD_NOW : RTLD_LAZY)),
+      contexts_(contexts),
+      broker_(strictBroker(*this)) {
+    load();
+}
+
+StrictHost::~StrictHost() {
+    EXPECT_TRUE(unload(true)) << "a library stays in the process";
+}
+
+StrictHost& StrictHost::of(const CMPIBroker* broker) {
+    return *static_cast<StrictHost*>(broker->hdl);
+}
+
+const CMPIContext* StrictHost::context(const std::string& nameSpace) const {
+    std::vector<cimom::NamedValue> entries;
+    if (contexts_ == Contexts::filled) {
+        cimom::Value flags;
+        flags.type = cimom::Type::uint32;
+        flags.content = cimom::Scalar(std::uint64_t{0});
+        entries = {{"CMPIInitNameSpace", cimom::Value::ofString(nameSpace)},
+                   {"CMPIPrincipal", cimom::Value::ofString("root")},
+                   {"CMPIInvocationFlags", flags}};
+    }
+    return RequestObjects::make<ContextObject>(repository_, std::move(entries));
+}
+
+template <typename Record>
+void StrictHost::create(Library& library, const std::string& provider, const char* kind,
+                        Record*& record) {
+    using Factory = Record* (*)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
+    const std::string name = provider + "_Create_" + kind + "MI";
+    const auto factory = reinterpret_cast<Factory>(::dlsym(library.handle, name.c_str()));
+    ASSERT_NE(factory, nullptr) << name;
+    const RequestObjects objects;
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    Record* made = factory(&broker_, context("root/cimv2"), &status);
+    ASSERT_NE(made, nullptr) << name;
+    ASSERT_NE(made->ft, nullptr) << name;
+    EXPECT_LE(made->ft->ftVersion, 200);
+    EXPECT_TRUE(record == nullptr || record == made) << name << " gave another record";
+    record = made;
+}
+
+void StrictHost::load() {
+    for (const cimom::Registration& registration : registrations_) {
+        Library& library = libraries_[registration.location];
+        if (library.handle == nullptr) {
+            const std::string file = directory_ + "/lib" + registration.location + ".so";
+            library.handle = ::dlopen(file.c_str(), flags_);
+            ASSERT_NE(library.handle, nullptr) << ::dlerror();
+        }
+        if (registration.instance) {
+            create(library, registration.provider, "Instance", library.instance);
+        }
+        if (registration.association) {
+            create(library, registration.provider, "Association", library.association);
+        }
+    }
+}
+
+bool StrictHost::unload(bool terminating) {
+    bool gone = true;
+    for (auto& [location, library] : libraries_) {
+        const RequestObjects objects;
+        const auto cleanUp = [&](auto* record) {
+            if (record != nullptr) {
+                const CMPIStatus status =
+                    callSlot("cleanup", record->ft->cleanup, record, context("root/cimv2"),
+                             static_cast<CMPIBoolean>(terminating ? 1 : 0));
+                EXPECT_EQ(status.rc, CMPI_RC_OK);
+            }
+        };
+        cleanUp(library.instance);
+        cleanUp(library.association);
+        EXPECT_EQ(::dlclose(library.handle), 0);
+        const std::string file = directory_ + "/lib" + location + ".so";
+        if (void* still = ::dlopen(file.c_str(), RTLD_NOW | RTLD_NOLOAD)) {
+            ::dlclose(still);
+            gone = false;
+        }
+    }
+    libraries_.clear();
+    return gone;
+}
+
+void* StrictHost::symbol(const std::string& location, const std::string& name) const {
+    return ::dlsym(libraries_.at(location).handle, name.c_str());
+}
+
+StrictHost::Answer StrictHost::request(Kind kind, const cimom::ObjectPath& path, const Call& call) {
+    const RequestObjects objects;
+    auto* result = RequestObjects::make<ResultObject>(repository_, kind);
+    const CMPIStatus status =
+        call(context(path.nameSpace), result, RequestObjects::make<PathObject>(repository_, path));
+    if (status.msg != nullptr) {
+        RequestObjects::get<StringObject>(status.msg, "The status");
+    }
+    if (status.rc != CMPI_RC_OK) {
+        return {status.rc, {}, {}};
+    }
+    return {CMPI_RC_OK, std::move(result->paths), std::move(result->instances)};
+}
+
+const StrictHost::Library* StrictHost::serving(const std::string& className) const {
+    for (const cimom::Registration& registration : registrations_) {
+        if (cimom::sameName(registration.className, className)) {
+            return &libraries_.at(registration.location);
+        }
+    }
+    return nullptr;
+}
+
+StrictHost::Answer StrictHost::eachClass(
+    Kind kind, const cimom::ObjectPath& path,
+    const std::function<CMPIStatus(const Library&, const CMPIContext*, const CMPIResult*,
+                                   const CMPIObjectPath*)>& call) {
+    Answer all;
+    for (const cimom::Registration& registration : registrations_) {
+        if (!registration.instance || !repository_.isA(registration.className, path.className)) {
+            continue;
+        }
+        cimom::ObjectPath ofSubclass = path;
+        ofSubclass.className = registration.className;
+        const Library& library = libraries_.at(registration.location);
+        append(all, request(kind, ofSubclass, [&](auto* context, auto* result, auto* record) {
+                   return call(library, context, result, record);
+               }));
+    }
+    return all;
+}
+
+StrictHost::Answer StrictHost::enumerateNames(const cimom::ObjectPath& path) {
+    return eachClass(Kind::paths, path, [](auto& library, auto* context, auto* result, auto* op) {
+        return callSlot("enumerateInstanceNames", library.instance->ft->enumerateInstanceNames,
+                        library.instance, context, result, op);
+    });
+}
+
+StrictHost::Answer StrictHost::enumerate(const cimom::ObjectPath& path, const char** properties) {
+    return eachClass(
+        Kind::instances, path, [=](auto& library, auto* context, auto* result, auto* op) {
+            return callSlot("enumerateInstances", library.instance->ft->enumerateInstances,
+                            library.instance, context, result, op, properties);
+        });
+}
+
+StrictHost::Answer StrictHost::ofClass(
+    Kind kind, const cimom::ObjectPath& path,
+    const std::function<CMPIStatus(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
+                                   const CMPIObjectPath*)>& call) {
+    const Library* library = serving(path.className);
+    if (library == nullptr) {
+        return {CMPI_RC_ERR_NOT_SUPPORTED, {}, {}};
+    }
+    return request(kind, path, [&](auto* context, auto* result, auto* op) {
+        return call(library->instance, context, result, op);
+    });
+}
+
+StrictHost::Answer StrictHost::get(const cimom::ObjectPath& path, const char** properties) {
+    return ofClass(Kind::instances, path, [=](auto* mi, auto* context, auto* result, auto* op) {
+        return callSlot("getInstance", mi->ft->getInstance, mi, context, result, op, properties);
+    });
+}
+
+StrictHost::Answer StrictHost::create(const cimom::Instance& instance) {
+    return ofClass(Kind::paths, instance.path,
+                   [&](auto* mi, auto* context, auto* result, auto* op) {
+                       return callSlot("createInstance", mi->ft->createInstance, mi, context,
+                                       result, op, newInstance(instance));
+                   });
+}
+
+StrictHost::Answer StrictHost::modify(const cimom::Instance& instance, const char** properties) {
+    return ofClass(Kind::nothing, instance.path,
+                   [&](auto* mi, auto* context, auto* result, auto* op) {
+                       return callSlot("modifyInstance", mi->ft->modifyInstance, mi, context,
+                                       result, op, newInstance(instance), properties);
+                   });
+}
+
+const CMPIInstance* StrictHost::newInstance(const cimom::Instance& instance) const {
+    return RequestObjects::make<InstanceObject>(repository_, instance);
+}
+
+StrictHost::Answer StrictHost::remove(const cimom::ObjectPath& path) {
+    return ofClass(Kind::nothing, path, [](auto* mi, auto* context, auto* result, auto* op) {
+        return callSlot("deleteInstance", mi->ft->deleteInstance, mi, context, result, op);
+    });
+}
+
+StrictHost::Answer StrictHost::query(const cimom::ObjectPath& path, const char* text,
+                                     const char* language) {
+    return ofClass(Kind::instances, path, [=](auto* mi, auto* context, auto* result, auto* op) {
+        return callSlot("execQuery", mi->ft->execQuery, mi, context, result, op, text, language);
+    });
+}
+
+StrictHost::Answer StrictHost::eachAssociator(
+    Kind kind, const cimom::ObjectPath& path,
+    const std::function<CMPIStatus(CMPIAssociationMI*, const CMPIContext*, const CMPIResult*,
+                                   const CMPIObjectPath*)>& call) {
+    Answer all;
+    for (const auto& entry : libraries_) {
+        CMPIAssociationMI* mi = entry.second.association;
+        if (mi != nullptr) {
+            append(all, request(kind, path, [&](auto* context, auto* result, auto* op) {
+                       return call(mi, context, result, op);
+                   }));
+        }
+    }
+    return all;
+}
+
+StrictHost::Answer StrictHost::associatorNames(const cimom::ObjectPath& path,
+                                               const Filter& filter) {
+    return eachAssociator(Kind::paths, path, [&](auto* mi, auto* context, auto* result, auto* op) {
+        return callSlot("associatorNames", mi->ft->associatorNames, mi, context, result, op,
+                        filter.association, filter.resultClass, filter.role, filter.resultRole);
+    });
+}
+
+StrictHost::Answer StrictHost::associators(const cimom::ObjectPath& path, const Filter& filter,
+                                           const char** properties) {
+    return eachAssociator(Kind::instances, path,
+                          [&](auto* mi, auto* context, auto* result, auto* op) {
+                              return callSlot("associators", mi->ft->associators, mi, context,
+                                              result, op, filter.association, filter.resultClass,
+                                              filter.role, filter.resultRole, properties);
+                          });
+}
+
+StrictHost::Answer StrictHost::referenceNames(const cimom::ObjectPath& path, const Filter& filter) {
+    return eachAssociator(Kind::paths, path, [&](auto* mi, auto* context, auto* result, auto* op) {
+        return callSlot("referenceNames", mi->ft->referenceNames, mi, context, result, op,
+                        filter.association, filter.role);
+    });
+}
+
+StrictHost::Answer StrictHost::references(const cimom::ObjectPath& path, const Filter& filter,
+                                          const char** properties) {
+    return eachAssociator(Kind::instances, path,
+                          [&](auto* mi, auto* context, auto* result, auto* op) {
+                              return callSlot("references", mi->ft->references, mi, context, result,
+                                              op, filter.association, filter.role, properties);
+                          });
+}
+
+}  // namespace strict

@@ -1,0 +1,126 @@
+#pragma once
+
+#include <cmpift.h>
+
+#include <functional>
+#include <map>
+#include <string>
+#include <vector>
+
+#include "cimom/ClassRepository.h"
+#include "cimom/ObjectManager.h"
+#include "kit/StrictObjects.h"
+
+namespace strict {
+
+/// An object manager for tests that treats providers as the least forgiving of the
+/// real ones do. Its libraries are opened with RTLD_GLOBAL; its broker tells version 0
+/// and has slots that are null; requests for a superclass become one call per
+/// registered class; association requests without a known class reach each provider
+/// once; nothing that a client sends is checked or filtered on its way; properties that
+/// stay unset show the default that the schema declares. What a provider may not do is
+/// a violation.
+///
+/// Requests may come from many threads; loading and unloading may not.
+class StrictHost {
+  public:
+    /// Whether symbols are bound when a library is opened, or when they are used.
+    enum class Binding { now, lazy };
+    /// Whether contexts have their usual entries, or none.
+    enum class Contexts { filled, empty };
+
+    struct Answer {
+        CMPIrc code = CMPI_RC_OK;
+        std::vector<cimom::ObjectPath> paths;
+        std::vector<cimom::Instance> instances;
+    };
+
+    StrictHost(const std::string& schemaDirectory, const std::vector<std::string>& registrations,
+               std::string libraryDirectory, Binding binding = Binding::now,
+               Contexts contexts = Contexts::filled);
+    ~StrictHost();
+    StrictHost(const StrictHost&) = delete;
+    StrictHost& operator=(const StrictHost&) = delete;
+
+    [[nodiscard]] const cimom::ClassRepository& repository() const { return repository_; }
+    [[nodiscard]] const std::vector<cimom::Registration>& registrations() const {
+        return registrations_;
+    }
+
+    /// Opens each registered library and calls its factories, once per class.
+    void load();
+    /// Cleans up each kind of each library once, and closes the libraries. False when
+    /// one of them is still in the process afterwards.
+    bool unload(bool terminating = false);
+
+    Answer enumerateNames(const cimom::ObjectPath& path);
+    Answer enumerate(const cimom::ObjectPath& path, const char** properties = nullptr);
+    Answer get(const cimom::ObjectPath& path, const char** properties = nullptr);
+    Answer create(const cimom::Instance& instance);
+    Answer modify(const cimom::Instance& instance, const char** properties = nullptr);
+    Answer remove(const cimom::ObjectPath& path);
+    Answer query(const cimom::ObjectPath& path, const char* text, const char* language);
+
+    /// What association requests may name, or not.
+    struct Filter {
+        const char* association = nullptr;  ///< the result class of references
+        const char* resultClass = nullptr;
+        const char* role = nullptr;
+        const char* resultRole = nullptr;
+    };
+    Answer associatorNames(const cimom::ObjectPath& path, const Filter& filter);
+    Answer associators(const cimom::ObjectPath& path, const Filter& filter,
+                       const char** properties = nullptr);
+    Answer referenceNames(const cimom::ObjectPath& path, const Filter& filter);
+    Answer references(const cimom::ObjectPath& path, const Filter& filter,
+                      const char** properties = nullptr);
+
+    /// A symbol of a registered library; null when it does not export it.
+    [[nodiscard]] void* symbol(const std::string& location, const std::string& name) const;
+
+    /// Runs something as a request: `call(context, result, path)`.
+    using Call =
+        std::function<CMPIStatus(const CMPIContext*, const CMPIResult*, const CMPIObjectPath*)>;
+    Answer request(ResultObject::Kind kind, const cimom::ObjectPath& path, const Call& call);
+
+    /// The host of a broker record.
+    static StrictHost& of(const CMPIBroker* broker);
+    [[nodiscard]] const CMPIBroker* broker() const { return &broker_; }
+
+  private:
+    struct Library {
+        void* handle = nullptr;
+        CMPIInstanceMI* instance = nullptr;
+        CMPIAssociationMI* association = nullptr;
+    };
+
+    template <typename Record>
+    void create(Library& library, const std::string& provider, const char* kind, Record*& record);
+    /// The library of a class that is registered itself.
+    const Library* serving(const std::string& className) const;
+    /// Calls the provider of each registered class at or below the path's, with that class.
+    Answer eachClass(
+        ResultObject::Kind kind, const cimom::ObjectPath& path,
+        const std::function<CMPIStatus(const Library&, const CMPIContext*, const CMPIResult*,
+                                       const CMPIObjectPath*)>& call);
+    /// Calls each provider of associations once.
+    Answer eachAssociator(
+        ResultObject::Kind kind, const cimom::ObjectPath& path,
+        const std::function<CMPIStatus(CMPIAssociationMI*, const CMPIContext*, const CMPIResult*,
+                                       const CMPIObjectPath*)>& call);
+    Answer ofClass(ResultObject::Kind kind, const cimom::ObjectPath& path,
+                   const std::function<CMPIStatus(CMPIInstanceMI*, const CMPIContext*,
+                                                  const CMPIResult*, const CMPIObjectPath*)>& call);
+    const CMPIContext* context(const std::string& nameSpace) const;
+    [[nodiscard]] const CMPIInstance* newInstance(const cimom::Instance& instance) const;
+
+    cimom::ClassRepository repository_;
+    std::vector<cimom::Registration> registrations_;
+    std::string directory_;
+    int flags_;
+    Contexts contexts_;
+    CMPIBroker broker_;
+    std::map<std::string, Library> libraries_;  ///< by location
+};
+
+}  // namespace strict

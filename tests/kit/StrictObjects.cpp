@@ -1,0 +1,401 @@
+#include "kit/StrictObjects.h"
+
+#include "cimom/ObjectPathText.h"
+#include "kit/StrictValues.h"
+
+namespace strict {
+
+namespace {
+
+thread_local RequestObjects* current = nullptr;
+
+}  // namespace
+
+void Violations::add(std::string text) {
+    const std::lock_guard lock(mutex_);
+    texts_.push_back(std::move(text));
+}
+
+std::vector<std::string> Violations::take() {
+    const std::lock_guard lock(mutex_);
+    return std::exchange(texts_, {});
+}
+
+Violations& violations() {
+    static Violations instance;
+    return instance;
+}
+
+RequestObjects::RequestObjects() : outer_(std::exchange(current, this)) {}
+
+RequestObjects::~RequestObjects() {
+    current = outer_;
+}
+
+void RequestObjects::note(const char* function, const char* violation) {
+    std::string text(function);
+    violations().add(text.append(" ").append(violation));
+}
+
+void RequestObjects::keep(const void* record, std::shared_ptr<void> object) {
+    if (current == nullptr) {
+        violations().add("An object is made outside of any request");
+        // It has to live somewhere; the test fails anyway.
+        static RequestObjects strays;
+        strays.objects_.emplace(record, std::move(object));
+        return;
+    }
+    current->objects_.emplace(record, std::move(object));
+}
+
+void* RequestObjects::find(const void* record) {
+    for (const RequestObjects* request = current; request != nullptr; request = request->outer_) {
+        const auto found = request->objects_.find(record);
+        if (found != request->objects_.end()) {
+            return found->second.get();
+        }
+    }
+    return nullptr;
+}
+
+void answer(CMPIStatus* status, CMPIrc code) {
+    if (status != nullptr) {
+        *status = {code, nullptr};
+    }
+}
+
+bool given(const void* argument, const char* function, const char* name) {
+    if (argument == nullptr) {
+        violations().add(std::string(function) + " was given no " + name);
+    }
+    return argument != nullptr;
+}
+
+namespace {
+
+constexpr int oldLevel = 1;  // what SFCB says in most of its tables
+
+// Strings.
+
+const char* getCharPtr(const CMPIString* string, CMPIStatus* status) {
+    StringObject* object = RequestObjects::get<StringObject>(string, "getCharPtr");
+    answer(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    return object == nullptr ? nullptr : object->text.data();
+}
+
+// Arrays.
+
+CMPIStatus setElementAt(const CMPIArray* array, CMPICount index, const CMPIValue* value,
+                        CMPIType type) {
+    ArrayObject* object = RequestObjects::get<ArrayObject>(array, "setElementAt");
+    if (object == nullptr || !given(value, "setElementAt", "value")) {
+        return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
+    }
+    if (index >= object->elements.size() || type != object->type) {
+        violations().add("setElementAt was given a wrong index or type");
+        return {CMPI_RC_ERR_TYPE_MISMATCH, nullptr};
+    }
+    object->elements[index] = scalarFrom(*value, type, "setElementAt");
+    return {CMPI_RC_OK, nullptr};
+}
+
+// Object paths.
+
+/// A text of a path; an object manager may answer null for one that is not set.
+CMPIString* component(const CMPIObjectPath* path, CMPIStatus* status, const char* function,
+                      std::string cimom::ObjectPath::*member) {
+    const PathObject* object = RequestObjects::get<PathObject>(path, function);
+    answer(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    if (object == nullptr || (object->model.*member).empty()) {
+        return nullptr;
+    }
+    return RequestObjects::make<StringObject>(object->model.*member);
+}
+
+CMPIString* getNameSpace(const CMPIObjectPath* path, CMPIStatus* status) {
+    return component(path, status, "getNameSpace", &cimom::ObjectPath::nameSpace);
+}
+
+CMPIString* getClassName(const CMPIObjectPath* path, CMPIStatus* status) {
+    return component(path, status, "getClassName", &cimom::ObjectPath::className);
+}
+
+CMPIStatus addKey(const CMPIObjectPath* path, const char* name, const CMPIValue* value,
+                  CMPIType type) {
+    PathObject* object = RequestObjects::get<PathObject>(path, "addKey");
+    if (object == nullptr || !given(name, "addKey", "name") || !given(value, "addKey", "value")) {
+        return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
+    }
+    if (!hasType(*object->repository, object->model.className, name, type, "addKey")) {
+        return {CMPI_RC_ERR_TYPE_MISMATCH, nullptr};
+    }
+    put(object->model.keys, name, valueFrom(*value, type, "addKey"));
+    return {CMPI_RC_OK, nullptr};
+}
+
+CMPIData getKey(const CMPIObjectPath* path, const char* name, CMPIStatus* status) {
+    const PathObject* object = RequestObjects::get<PathObject>(path, "getKey");
+    if (object == nullptr || !given(name, "getKey", "name")) {
+        answer(status, CMPI_RC_ERR_INVALID_HANDLE);
+        return missing();
+    }
+    const cimom::Value* value = object->model.key(name);
+    // So says SFCB of a missing key, and other object managers something else.
+    answer(status, value == nullptr ? CMPI_RC_ERR_NOT_FOUND : CMPI_RC_OK);
+    return value == nullptr ? missing() : dataFrom(*object->repository, *value, CMPI_keyValue);
+}
+
+CMPIData getKeyAt(const CMPIObjectPath* path, CMPICount index, CMPIString** name,
+                  CMPIStatus* status) {
+    const PathObject* object = RequestObjects::get<PathObject>(path, "getKeyAt");
+    if (object == nullptr || index >= object->model.keys.size()) {
+        answer(status, CMPI_RC_ERR_NO_SUCH_PROPERTY);
+        return missing();
+    }
+    answer(status, CMPI_RC_OK);
+    const cimom::NamedValue& key = object->model.keys[index];
+    if (name != nullptr) {
+        *name = RequestObjects::make<StringObject>(key.name);
+    }
+    return dataFrom(*object->repository, key.value, CMPI_keyValue);
+}
+
+CMPICount getKeyCount(const CMPIObjectPath* path, CMPIStatus* status) {
+    const PathObject* object = RequestObjects::get<PathObject>(path, "getKeyCount");
+    answer(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    return object == nullptr ? 0 : static_cast<CMPICount>(object->model.keys.size());
+}
+
+CMPIString* pathToString(const CMPIObjectPath* path, CMPIStatus* status) {
+    const PathObject* object = RequestObjects::get<PathObject>(path, "toString");
+    answer(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    return object == nullptr ? nullptr
+                             : RequestObjects::make<StringObject>(cimom::toText(object->model));
+}
+
+// Instances.
+
+CMPIData getProperty(const CMPIInstance* instance, const char* name, CMPIStatus* status) {
+    const InstanceObject* object = RequestObjects::get<InstanceObject>(instance, "getProperty");
+    if (object == nullptr || !given(name, "getProperty", "name")) {
+        answer(status, CMPI_RC_ERR_INVALID_HANDLE);
+        return missing();
+    }
+    const cimom::Value* value = object->model.property(name);
+    answer(status, value == nullptr ? CMPI_RC_ERR_NO_SUCH_PROPERTY : CMPI_RC_OK);
+    return value == nullptr ? missing() : dataFrom(*object->repository, *value, CMPI_goodValue);
+}
+
+CMPIStatus setProperty(const CMPIInstance* instance, const char* name, const CMPIValue* value,
+                       CMPIType type) {
+    InstanceObject* object = RequestObjects::get<InstanceObject>(instance, "setProperty");
+    if (object == nullptr || !given(name, "setProperty", "name") ||
+        !given(value, "setProperty", "value")) {
+        return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
+    }
+    if (!hasType(*object->repository, object->model.path.className, name, type, "setProperty")) {
+        return {CMPI_RC_ERR_TYPE_MISMATCH, nullptr};
+    }
+    put(object->model.properties, name, valueFrom(*value, type, "setProperty"));
+    return {CMPI_RC_OK, nullptr};
+}
+
+CMPIObjectPath* getObjectPath(const CMPIInstance* instance, CMPIStatus* status) {
+    const InstanceObject* object = RequestObjects::get<InstanceObject>(instance, "getObjectPath");
+    answer(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    return object == nullptr
+               ? nullptr
+               : RequestObjects::make<PathObject>(*object->repository, object->model.path);
+}
+
+// Enumerations.
+
+/// A record whose use crashes, or is noted.
+CMPIInstance* deadInstance() {
+    static CMPIInstance dead{nullptr, nullptr};
+    return &dead;
+}
+
+CMPIData getNext(const CMPIEnumeration* enumeration, CMPIStatus* status) {
+    EnumerationObject* object = RequestObjects::get<EnumerationObject>(enumeration, "getNext");
+    if (object == nullptr || object->next == object->items.size()) {
+        // Past the end there is an error status, and data that nobody may look at.
+        answer(status, CMPI_RC_ERR_FAILED);
+        CMPIData undefined{};
+        undefined.type = CMPI_instance;
+        undefined.value.inst = deadInstance();
+        return undefined;
+    }
+    answer(status, CMPI_RC_OK);
+    CMPIData data{};
+    data.type = CMPI_instance;
+    data.value.inst =
+        RequestObjects::make<InstanceObject>(*object->repository, object->items[object->next]);
+    ++object->next;
+    return data;
+}
+
+CMPIBoolean hasNext(const CMPIEnumeration* enumeration, CMPIStatus* status) {
+    const EnumerationObject* object =
+        RequestObjects::get<EnumerationObject>(enumeration, "hasNext");
+    answer(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    return object != nullptr && object->next < object->items.size() ? 1 : 0;
+}
+
+// Contexts.
+
+CMPIData getEntry(const CMPIContext* context, const char* name, CMPIStatus* status) {
+    const ContextObject* object = RequestObjects::get<ContextObject>(context, "getEntry");
+    if (object != nullptr && given(name, "getEntry", "name")) {
+        for (const cimom::NamedValue& entry : object->entries) {
+            if (entry.name == name) {
+                answer(status, CMPI_RC_OK);
+                return dataFrom(*object->repository, entry.value, CMPI_goodValue);
+            }
+        }
+    }
+    answer(status, CMPI_RC_ERR_NO_SUCH_PROPERTY);
+    return missing();
+}
+
+// Results.
+
+/// The result, unless it is closed already.
+ResultObject* openResult(const CMPIResult* result, const char* function) {
+    ResultObject* object = RequestObjects::get<ResultObject>(result, function);
+    if (object != nullptr && object->doneCalls > 0) {
+        violations().add(std::string(function) + " came after returnDone");
+    }
+    return object;
+}
+
+CMPIStatus returnInstance(const CMPIResult* result, const CMPIInstance* instance) {
+    ResultObject* object = openResult(result, "returnInstance");
+    const InstanceObject* delivered =
+        RequestObjects::get<InstanceObject>(instance, "returnInstance");
+    if (object == nullptr || delivered == nullptr) {
+        return {CMPI_RC_ERR_INVALID_PARAMETER, nullptr};
+    }
+    if (object->kind != ResultObject::Kind::instances) {
+        violations().add("returnInstance answers a request that is not for instances");
+    }
+    checkDelivered(*object->repository, delivered->model);
+    object->instances.push_back(withDefaults(*object->repository, delivered->model));
+    return {CMPI_RC_OK, nullptr};
+}
+
+CMPIStatus returnObjectPath(const CMPIResult* result, const CMPIObjectPath* path) {
+    ResultObject* object = openResult(result, "returnObjectPath");
+    const PathObject* delivered = RequestObjects::get<PathObject>(path, "returnObjectPath");
+    if (object == nullptr || delivered == nullptr) {
+        return {CMPI_RC_ERR_INVALID_PARAMETER, nullptr};
+    }
+    if (object->kind != ResultObject::Kind::paths) {
+        violations().add("returnObjectPath answers a request that is not for paths");
+    }
+    checkDelivered(*object->repository, delivered->model);
+    object->paths.push_back(delivered->model);
+    return {CMPI_RC_OK, nullptr};
+}
+
+CMPIStatus returnDone(const CMPIResult* result) {
+    ResultObject* object = openResult(result, "returnDone");
+    if (object == nullptr) {
+        return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
+    }
+    ++object->doneCalls;
+    return {CMPI_RC_OK, nullptr};
+}
+
+template <typename Table>
+Table emptyTable() {
+    Table table{};
+    table.ftVersion = oldLevel;
+    return table;
+}
+
+}  // namespace
+
+// What no table below names is null, as some or all slots are in some object manager:
+// a provider that comes to use one crashes here first.
+
+const CMPIStringFT StringObject::table = [] {
+    auto table = emptyTable<CMPIStringFT>();
+    table.getCharPtr = &getCharPtr;
+    return table;
+}();
+
+const CMPIArrayFT ArrayObject::table = [] {
+    auto table = emptyTable<CMPIArrayFT>();
+    table.setElementAt = &setElementAt;
+    return table;
+}();
+
+const CMPIObjectPathFT PathObject::table = [] {
+    auto table = emptyTable<CMPIObjectPathFT>();
+    table.getNameSpace = &getNameSpace;
+    table.getClassName = &getClassName;
+    table.addKey = &addKey;
+    table.getKey = &getKey;
+    table.getKeyAt = &getKeyAt;
+    table.getKeyCount = &getKeyCount;
+    table.toString = &pathToString;
+    return table;
+}();
+
+const CMPIInstanceFT InstanceObject::table = [] {
+    auto table = emptyTable<CMPIInstanceFT>();
+    table.getProperty = &getProperty;
+    table.setProperty = &setProperty;
+    table.getObjectPath = &getObjectPath;
+    return table;
+}();
+
+const CMPIEnumerationFT EnumerationObject::table = [] {
+    auto table = emptyTable<CMPIEnumerationFT>();
+    table.getNext = &getNext;
+    table.hasNext = &hasNext;
+    return table;
+}();
+
+const CMPIContextFT ContextObject::table = [] {
+    auto table = emptyTable<CMPIContextFT>();
+    table.getEntry = &getEntry;
+    return table;
+}();
+
+const CMPIResultFT ResultObject::table = [] {
+    auto table = emptyTable<CMPIResultFT>();
+    table.returnInstance = &returnInstance;
+    table.returnObjectPath = &returnObjectPath;
+    table.returnDone = &returnDone;
+    return table;
+}();
+
+// Providers of old read the text straight out of the handle.
+StringObject::StringObject(std::string content)
+    : CMPIString{nullptr, &table}, text(std::move(content)) {
+    hdl = text.data();
+}
+
+PathObject::PathObject(const cimom::ClassRepository& classes, cimom::ObjectPath content)
+    : CMPIObjectPath{this, &table}, repository(&classes), model(std::move(content)) {}
+
+InstanceObject::InstanceObject(const cimom::ClassRepository& classes, cimom::Instance content)
+    : CMPIInstance{this, &table}, repository(&classes), model(std::move(content)) {}
+
+ArrayObject::ArrayObject(CMPICount size, CMPIType elementType)
+    : CMPIArray{this, &table}, type(elementType), elements(size) {}
+
+EnumerationObject::EnumerationObject(const cimom::ClassRepository& classes,
+                                     std::vector<cimom::Instance> content)
+    : CMPIEnumeration{this, &table}, repository(&classes), items(std::move(content)) {}
+
+ContextObject::ContextObject(const cimom::ClassRepository& classes,
+                             std::vector<cimom::NamedValue> content)
+    : CMPIContext{this, &table}, repository(&classes), entries(std::move(content)) {}
+
+ResultObject::ResultObject(const cimom::ClassRepository& classes, Kind kindOfRequest)
+    : CMPIResult{this, &table}, repository(&classes), kind(kindOfRequest) {}
+
+}  // namespace strict

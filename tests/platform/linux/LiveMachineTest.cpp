@@ -1,0 +1,399 @@
+// Files laid out in a directory, and prepared answers in place of the kernel's: the
+// whole way from bytes to nodes, for states that no test machine can be put into.
+// KernelTest.cpp and DhcpLifeTest.cpp go the same way with a real kernel and clients.
+
+#include "LiveMachine.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <linux/if_addr.h>
+
+#include <memory>
+
+#include "LinuxSupport.h"
+#include "ScriptedTransport.h"
+#include "clients/Clients.h"
+#include "zrcommon/SystemName.h"
+#include "zrlinux/LiveSource.h"
+
+namespace ZR::Live {
+namespace {
+
+using NodeLexicon::Properties;
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::IsEmpty;
+
+using Servers = std::vector<std::string>;
+
+class LiveMachineTest : public testing::Test {
+  protected:
+    static std::vector<Step> links(int count) {
+        std::vector<Message> messages;
+        for (int i = 1; i <= count; ++i) {
+            Message message = linkMessage(i + 1, "eth" + std::to_string(i), 0x11043);
+            message.number(IFLA_OPERSTATE, std::uint8_t{6});
+            messages.push_back(message);
+        }
+        messages.emplace_back(NLMSG_DONE, std::uint16_t{NLM_F_MULTI}, std::int32_t{0});
+        return {Step{messages}};
+    }
+    static std::vector<Step> address(unsigned ifindex, std::array<std::uint8_t, 4> bytes) {
+        return {Step{
+            {addressMessage(ifindex, bytes), Message{NLMSG_DONE, NLM_F_MULTI, std::int32_t{0}}}}};
+    }
+    static std::vector<Step> refused(int error) {
+        nlmsgerr answer{};
+        answer.error = -error;
+        return {Step{{Message{NLMSG_ERROR, 0, answer}}}};
+    }
+
+    LiveMachine& open(std::deque<std::vector<Step>> answers) {
+        Surroundings surroundings;
+        std::filesystem::create_directories(root_.path("/proc/thread-self/ns"));
+        surroundings.roots = {.files = root_.path(), .proc = root_.path("/proc")};
+        surroundings.transport = std::make_unique<ScriptedTransport>(std::move(answers));
+        surroundings.realProcesses = false;
+        surroundings.uptime = [this] { return uptime_; };
+        surroundings.askNetworkd = [this](auto /*deadline*/) {
+            ++asked_;
+            return networkd_;
+        };
+        surroundings.now = [this] { return now_; };
+        surroundings.complain = [this](std::string_view text) { complaints_.emplace_back(text); };
+        machine_ = std::make_unique<LiveMachine>(std::move(surroundings));
+        return *machine_;
+    }
+
+    TemporaryDirectory root_;
+    std::int64_t now_ = 1'795'216'200;
+    std::chrono::steady_clock::time_point uptime_{std::chrono::hours{1000}};
+    NetworkdAnswer networkd_;
+    int asked_ = 0;
+    std::vector<std::string> complaints_;
+    std::unique_ptr<LiveMachine> machine_;
+};
+
+TEST_F(LiveMachineTest, CapturedNetworkdLeaseOnItsLink) {
+    root_.write("/run/systemd/netif/links/2", sample("networkd/run-systemd-netif-links-2.txt"));
+    root_.write("/run/systemd/netif/leases/2", sample("networkd/run-systemd-netif-leases-2.txt"));
+    root_.write("/etc/systemd/network/10-eth1.network", sample("networkd/10-eth1.network"));
+    const auto tree = open({links(1), address(2, {198, 51, 100, 110})}).read();
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPEnabled), PropertyValue{true});
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::AddressSource), number(1));
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{"198.51.100.1"}});
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::IPv4Address), PropertyValue{"198.51.100.110"});
+    EXPECT_THAT(complaints_, IsEmpty());
+}
+
+TEST_F(LiveMachineTest, NetworkdItselfTellsOfTheServerOfADhcpv6Lease) {
+    root_.write("/run/systemd/netif/links/2", sample("networkd/run-systemd-netif-links-2.txt"));
+    networkd_.json = sample("networkd/networkctl-status-eth1.json");
+    ifaddrmsg info{};
+    info.ifa_family = 10;
+    info.ifa_prefixlen = 128;
+    info.ifa_index = 2;
+    Message longer{RTM_NEWADDR, NLM_F_MULTI, info};
+    constexpr std::array<std::uint8_t, 16> bytes{0x20, 0x01, 0x0d, 0xb8, 0, 0x99, 0, 0,
+                                                 0,    0,    0,    0,    0, 0,    1, 0xb2};
+    longer.attribute(IFA_ADDRESS, std::as_bytes(std::span{bytes}));
+    const std::vector<Step> both{Step{{addressMessage(2, {198, 51, 100, 110}), longer,
+                                       Message{NLMSG_DONE, NLM_F_MULTI, std::int32_t{0}}}}};
+    EXPECT_EQ(valueOf(*open({links(1), both}).read(), "eth1", Properties::DHCPServerAddresses),
+              (PropertyValue{Servers{"198.51.100.1", "fe80::e0cb:10ff:feee:2799"}}));
+}
+
+TEST_F(LiveMachineTest, NetworkdIsAskedOnlyWhereItHasLinks) {
+    static_cast<void>(open({links(1), address(2, {192, 0, 2, 1})}).read());
+    EXPECT_EQ(asked_, 0);
+}
+
+TEST_F(LiveMachineTest, ANetworkdThatDoesNotAnswerIsLeftAloneForAWhile) {
+    root_.write("/run/systemd/netif/links/2", sample("networkd/run-systemd-netif-links-2.txt"));
+    root_.write("/run/systemd/netif/leases/2", sample("networkd/run-systemd-netif-leases-2.txt"));
+    networkd_.reason = "too busy";
+    std::deque<std::vector<Step>> answers;
+    for (int i = 0; i < 4; ++i) {
+        answers.push_back(links(1));
+        answers.push_back(address(2, {198, 51, 100, 110}));
+    }
+    LiveMachine& machine = open(std::move(answers));
+    EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{"198.51.100.1"}})
+        << "its files tell it, too";
+    EXPECT_THAT(complaints_, ElementsAre("too busy"));
+    static_cast<void>(machine.read());
+    EXPECT_EQ(asked_, 1);
+    uptime_ += std::chrono::seconds{31};
+    networkd_ = {.json = "{", .reason = ""};
+    static_cast<void>(machine.read());
+    EXPECT_EQ(asked_, 2);
+    EXPECT_EQ(complaints_.back(), "cannot use what systemd-networkd says: no JSON object");
+}
+
+TEST_F(LiveMachineTest, CapturedDhclientLeaseLivesUntilItsEnd) {
+    root_.write("/var/lib/dhcp/dhclient.eth1.leases", sample("isc-dhclient/dhclient.eth1.leases"));
+    LiveMachine& machine = open(
+        {links(1), address(2, {198, 51, 100, 106}), links(1), address(2, {198, 51, 100, 106})});
+    EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{"198.51.100.1"}});
+    now_ = 1'795'216'781;
+    EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{}});
+}
+
+TEST_F(LiveMachineTest, CapturedReleaseLeavesTheOtherInterfaceItsServer) {
+    root_.write("/var/lib/dhcp/dhclient.leases",
+                sample("isc-dhclient/dhclient.leases.two-interfaces-then-release-eth1"));
+    const std::vector<Step> both{
+        Step{{addressMessage(3, {198, 51, 100, 122}), addressMessage(2, {198, 51, 100, 106}),
+              Message{NLMSG_DONE, NLM_F_MULTI, std::int32_t{0}}}}};
+    now_ = 1'795'216'234;
+    const auto tree = open({links(2), both}).read();
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPServerAddresses), PropertyValue{Servers{}});
+    EXPECT_EQ(valueOf(*tree, "eth2", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{"198.51.100.1"}});
+}
+
+TEST_F(LiveMachineTest, CapturedDhcpcdLeaseLivesUntilItsEnd) {
+    root_.write("/var/lib/dhcpcd/eth1.lease", sample("dhcpcd-10/eth1.lease"));
+    root_.age("/var/lib/dhcpcd/eth1.lease", now_);
+    const std::vector<Step> leased = address(2, {198, 51, 100, 121});
+    LiveMachine& machine = open({links(1), leased, links(1), leased});
+    EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{"198.51.100.1"}});
+    now_ += 600;
+    EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{}});
+}
+
+TEST_F(LiveMachineTest, CapturedNetworkManagerStateOnItsLink) {
+    root_.write("/run/NetworkManager/devices/2",
+                sample("networkmanager-internal/run-NetworkManager-devices-2.txt"));
+    now_ = 1'795'216'300;
+    const auto tree = open({links(1), address(2, {198, 51, 100, 109})}).read();
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{"198.51.100.1"}});
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::AddressSource), number(1));
+}
+
+TEST_F(LiveMachineTest, CapturedBootpAtTheStartOfTheSystem) {
+    root_.write("/run/net-eth1.conf", sample("klibc-ipconfig/run-net-eth1.conf.bootp"));
+    const auto tree = open({links(1), address(2, {203, 0, 113, 140})}).read();
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::AddressSource), number(2));
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{"203.0.113.1"}});
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPEnabled), PropertyValue{false});
+}
+
+TEST_F(LiveMachineTest, WhatCannotBeReadIsARemark) {
+    std::filesystem::create_directories(root_.path("/run/net-eth1.conf"));
+    LiveMachine& machine =
+        open({links(1), address(2, {192, 0, 2, 1}), links(1), address(2, {192, 0, 2, 1})});
+    const auto tree = machine.read();
+    ASSERT_EQ(tree->remarks().size(), 1U);
+    EXPECT_THAT(tree->remarks()[0], HasSubstr("cannot read " + root_.path("/run/net-eth1.conf")));
+    std::filesystem::remove_all(root_.path("/run/net-eth1.conf"));
+    EXPECT_TRUE(machine.changed());
+    EXPECT_THAT(machine.read()->remarks(), IsEmpty());
+}
+
+TEST_F(LiveMachineTest, WhatCouldNotBeReadIsTriedAgain) {
+    std::filesystem::create_directories(root_.path("/run/net-eth1.conf"));
+    LiveMachine& machine = open({links(1), address(2, {192, 0, 2, 1}), links(1),
+                                 address(2, {192, 0, 2, 1}), links(1), address(2, {192, 0, 2, 1})});
+    ASSERT_EQ(machine.read()->remarks().size(), 1U);
+    EXPECT_TRUE(machine.changed()) << "it may be over already";
+    ASSERT_EQ(machine.read()->remarks().size(), 1U);
+    EXPECT_FALSE(machine.changed()) << "it lasts";
+    uptime_ += std::chrono::seconds{1};
+    EXPECT_TRUE(machine.changed()) << "it may be over without a sign";
+    ASSERT_EQ(machine.read()->remarks().size(), 1U);
+    EXPECT_FALSE(machine.changed());
+    EXPECT_EQ(complaints_.size(), 1U);
+}
+
+TEST_F(LiveMachineTest, WhatSeveralReadersCannotReadIsToldOnce) {
+    // Leases of two clients lie there; a link to itself is nothing that can be read.
+    const std::string place = root_.path("/var/lib/NetworkManager");
+    std::filesystem::create_directories(root_.path("/var/lib"));
+    std::filesystem::create_symlink(place, place);
+    const auto tree = open({links(1), address(2, {192, 0, 2, 1})}).read();
+    EXPECT_THAT(tree->remarks(), testing::UnorderedElementsAre(HasSubstr("cannot read " + place),
+                                                               HasSubstr("cannot watch " + place)));
+}
+
+TEST_F(LiveMachineTest, TheComputerHasTheHostsName) {
+    const auto tree = open({links(1), address(2, {192, 0, 2, 1})}).read();
+    const auto* const name = tree->find(0, Properties::Name);
+    ASSERT_NE(name, nullptr);
+    EXPECT_EQ(name->value, PropertyValue{getSystemName()});
+}
+
+TEST_F(LiveMachineTest, UnreadableLinksGiveNoInterfacesAndOneLine) {
+    LiveMachine& machine = open({links(1), address(2, {192, 0, 2, 1}), refused(EPERM),
+                                 refused(EPERM), links(1), address(2, {192, 0, 2, 1})});
+    EXPECT_THAT(interfaceNames(*machine.read()), ElementsAre("eth1"));
+    EXPECT_THAT(interfaceNames(*machine.read()), IsEmpty());
+    EXPECT_THAT(complaints_, ElementsAre("network links: refused: Operation not permitted"));
+    EXPECT_TRUE(machine.changed()) << "to be read again";
+    EXPECT_THAT(interfaceNames(*machine.read()), IsEmpty());
+    EXPECT_EQ(complaints_.size(), 1U) << "a lasting trouble is told once";
+    EXPECT_THAT(interfaceNames(*machine.read()), ElementsAre("eth1"));
+    EXPECT_FALSE(machine.changed());
+}
+
+TEST_F(LiveMachineTest, ATroubleThatReturnsIsToldAgain) {
+    LiveMachine& machine =
+        open({refused(EPERM), links(1), address(2, {192, 0, 2, 1}), refused(EPERM)});
+    for (int i = 0; i < 3; ++i) {
+        static_cast<void>(machine.read());
+    }
+    EXPECT_EQ(complaints_.size(), 2U);
+}
+
+TEST_F(LiveMachineTest, AKernelThatDoesNotAnswerHoldsNobodyUp) {
+    LiveMachine& machine = open({links(1), address(2, {192, 0, 2, 1})});
+    EXPECT_THAT(interfaceNames(*machine.read()), ElementsAre("eth1"));
+    const auto tree = machine.read();
+    EXPECT_THAT(interfaceNames(*tree), IsEmpty()) << "what was once read is not shown again";
+    EXPECT_THAT(complaints_, ElementsAre(HasSubstr("network links: no answer: ")));
+    EXPECT_THAT(tree->remarks(), testing::ElementsAreArray(complaints_));
+    EXPECT_TRUE(machine.changed()) << "to be read again";
+}
+
+TEST_F(LiveMachineTest, InterruptedReadingsAreShownAndReadAgain) {
+    const std::vector<Step> interrupted{
+        Step{{linkMessage(2, "eth1", 0x11043, NLM_F_MULTI | NLM_F_DUMP_INTR),
+              Message{NLMSG_DONE, NLM_F_MULTI, std::int32_t{0}}}}};
+    LiveMachine& machine =
+        open({interrupted, interrupted, interrupted, address(2, {192, 0, 2, 1})});
+    EXPECT_THAT(interfaceNames(*machine.read()), ElementsAre("eth1"));
+    EXPECT_TRUE(machine.changed());
+}
+
+TEST_F(LiveMachineTest, ASocketThatAloneTellsOfAClientIsAskedAboutEachTime) {
+    const std::string udp = "/proc/thread-self/net/udp";
+    const std::string line =
+        "1: 010200C0:0044 630200C0:0043 01 00000000:00000000 00:00000000 00000000 0\n";
+    std::deque<std::vector<Step>> answers;
+    for (int i = 0; i < 4; ++i) {
+        answers.push_back(links(1));
+        answers.push_back(address(2, {192, 0, 2, 1}));
+    }
+    LiveMachine& machine = open(std::move(answers));
+    root_.write(udp, line);
+    EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{"192.0.2.99"}});
+    EXPECT_FALSE(machine.changed());
+    root_.write(udp, "");
+    EXPECT_TRUE(machine.changed());
+    EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{}});
+    EXPECT_FALSE(machine.changed());
+
+    // A program that could have it is watched itself.
+    root_.write(udp, line);
+    root_.write("/proc/17/comm", "NetworkManager\n");
+    static_cast<void>(machine.read());
+    root_.write(udp, "");
+    EXPECT_FALSE(machine.changed());
+}
+
+TEST_F(LiveMachineTest, WhatTheKernelAskedForAtItsStart) {
+    root_.write("/proc/thread-self/net/pnp", "#PROTO: BOOTP\nbootserver 192.0.2.99\n");
+    Message permanent = addressMessage(2, {192, 0, 2, 1});
+    permanent.number(IFA_FLAGS, std::uint32_t{IFA_F_PERMANENT});
+    const auto tree =
+        open({links(1), {Step{{permanent, Message{NLMSG_DONE, NLM_F_MULTI, std::int32_t{0}}}}}})
+            .read();
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::AddressSource), number(2));
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{"192.0.2.99"}});
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPEnabled), PropertyValue{false});
+}
+
+TEST_F(LiveMachineTest, AnAddressThatConnmanGotByDhcp) {
+    root_.write("/proc/17/comm", "connmand\n");
+    root_.write("/var/lib/connman/ethernet_5254_cable/settings",
+                "[ethernet_5254_cable]\nIPv4.method=dhcp\nIPv4.DHCP.LastAddress=192.0.2.1\n");
+    LiveMachine& machine =
+        open({links(1), address(2, {192, 0, 2, 1}), links(1), address(2, {192, 0, 2, 1})});
+    const auto tree = machine.read();
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::AddressSource), number(1));
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPEnabled), PropertyValue{true});
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPServerAddresses), PropertyValue{Servers{}});
+    EXPECT_FALSE(machine.changed());
+    root_.append("/var/lib/connman/ethernet_5254_cable/settings", "IPv4.method=manual\n");
+    EXPECT_TRUE(machine.changed());
+}
+
+TEST_F(LiveMachineTest, BeforeItIsReadItCountsAsChanged) {
+    EXPECT_TRUE(open({}).changed());
+}
+
+TEST_F(LiveMachineTest, EveryPlaceThatItReadsIsWatched) {
+    root_.write("/proc/17/comm", "dhclient\n");
+    root_.write("/proc/17/cmdline", std::string{"dhclient\0-lf\0/srv/own.leases\0eth1\0", 34});
+    for (const char* process : {"17", "thread-self"}) {
+        std::filesystem::create_directories(root_.path("/proc/") + process + "/ns");
+        std::filesystem::create_symlink("net:[1]", root_.path("/proc/") + process + "/ns/net");
+    }
+    root_.write("/etc/network/interfaces", "source interfaces.d/*\n");
+    root_.write("/run/systemd/netif/links/2",
+                "ADMIN_STATE=configured\nNETWORK_FILE=/etc/systemd/network/a.network\n");
+    std::deque<std::vector<Step>> answers;
+    for (int i = 0; i < 100; ++i) {
+        answers.push_back(links(1));
+        answers.push_back(address(2, {192, 0, 2, 1}));
+    }
+    LiveMachine& machine = open(std::move(answers));
+    static_cast<void>(machine.read());
+    EXPECT_FALSE(machine.changed());
+    std::vector<std::string> files{"/srv/own.leases", "/etc/systemd/network/a.network",
+                                   "/run/systemd/network/a.network.d/a.conf",
+                                   "/etc/network/interfaces.d/a"};
+    for (const ClientSource& source : clientSources()) {
+        for (const ClientPlace& place : source.places) {
+            files.push_back(std::string{place.directory} + '/' + std::string{place.namePrefix} +
+                            "x");
+        }
+    }
+    for (const std::string& file : files) {
+        root_.write(file, "x");
+        EXPECT_TRUE(machine.changed()) << file;
+        static_cast<void>(machine.read());
+        EXPECT_FALSE(machine.changed()) << file;
+        root_.append(file, "y");
+        EXPECT_TRUE(machine.changed()) << file;
+        static_cast<void>(machine.read());
+        EXPECT_FALSE(machine.changed()) << file;
+    }
+}
+
+TEST_F(LiveMachineTest, WirelessDevicesAreDescribedAsSuch) {
+    Message device = linkMessage(2, "wlan0", 0x11043);
+    device.text(56, "0000:00:03.0");
+    Message other = linkMessage(3, "eth0", 0x11043);
+    other.text(56, "0000:00:04.0");
+    std::filesystem::create_directories(root_.path("/sys/class/net/wlan0/phy80211"));
+    const auto tree =
+        open({{Step{{device, other, Message{NLMSG_DONE, NLM_F_MULTI, std::int32_t{0}}}}},
+              address(2, {192, 0, 2, 1})})
+            .read();
+    EXPECT_EQ(tree->node(interfaceNode(*tree, "wlan0")).description, "Wireless interface");
+    EXPECT_EQ(tree->node(interfaceNode(*tree, "eth0")).description, "Ethernet interface");
+}
+
+TEST(LiveSource, ReadsThisMachine) {
+    const auto source = openLiveSource();
+    ASSERT_NE(source, nullptr);
+    EXPECT_TRUE(source->changed());
+    const auto tree = source->read();
+    ASSERT_NE(tree, nullptr);
+    EXPECT_EQ(tree->node(0).type, "ComputerSystem");
+}
+
+}  // namespace
+}  // namespace ZR::Live

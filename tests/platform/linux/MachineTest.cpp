@@ -1,0 +1,185 @@
+#include "Machine.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <linux/if.h>
+#include <linux/if_arp.h>
+#include <sys/socket.h>
+
+#include "LinuxSupport.h"
+
+namespace ZR::Live {
+namespace {
+
+using testing::ElementsAre;
+using testing::IsEmpty;
+using testing::Pointee;
+
+constexpr std::int64_t now = 1'800'000'000;
+
+/// Links eth2 and eth3, of these indexes, with 192.0.2.2 and 192.0.2.3.
+class MachineTest : public testing::Test {
+  protected:
+    MachineTest() {
+        for (const std::uint32_t ifindex : {2U, 3U}) {
+            const std::string number = std::to_string(ifindex);
+            facts_.links.push_back({.ifindex = ifindex,
+                                    .name = "eth" + number,
+                                    .flags = std::uint32_t{IFF_UP} | IFF_BROADCAST,
+                                    .arphrdType = ARPHRD_ETHER,
+                                    .kind = "",
+                                    .slaveKind = "",
+                                    .netnsid = {},
+                                    .carrier = {}});
+            facts_.addresses.push_back({.ifindex = ifindex,
+                                        .family = AF_INET,
+                                        .text = "192.0.2." + number,
+                                        .validLifetime = 600,
+                                        .preferredLifetime = 600});
+        }
+    }
+    static Lease lease(const std::string& interface, const std::string& address) {
+        return {.client = Client::Dhcpcd,
+                .interfaceName = interface,
+                .family = AF_INET,
+                .address = address,
+                .server = "192.0.2.1",
+                .expires = now + 600};
+    }
+    Machine& machine() {
+        machine_ = std::make_unique<Machine>(facts_, now);
+        return *machine_;
+    }
+    const InterfaceView& first() { return machine().interfaces()[0]; }
+
+    MachineFacts facts_;
+    std::unique_ptr<Machine> machine_;
+};
+
+TEST_F(MachineTest, LeasesOfBothProtocolsStandApart) {
+    facts_.addresses.push_back({.ifindex = 2, .family = AF_INET6, .text = "2001:db8::2"});
+    facts_.clients.leases = {lease("eth2", "192.0.2.2"), lease("eth2", "2001:db8::2")};
+    facts_.clients.leases[1].family = AF_INET6;
+    const InterfaceView& view = first();
+    EXPECT_THAT(view.leases, ElementsAre(Pointee(facts_.clients.leases[0])));
+    EXPECT_THAT(view.leases6, ElementsAre(Pointee(facts_.clients.leases[1])));
+}
+
+TEST_F(MachineTest, OnlyWhatOutlivesItsEndIsKeptBehindIt) {
+    facts_.clients.leases = {lease("eth2", "192.0.2.2")};
+    facts_.clients.leases[0].expires = now;
+    EXPECT_EQ(first().formerLease, nullptr);
+    facts_.clients.leases[0].outlivesEnd = true;
+    EXPECT_NE(first().formerLease, nullptr);
+    EXPECT_THAT(first().leases, IsEmpty());
+    facts_.addresses.clear();
+    EXPECT_EQ(first().formerLease, nullptr);
+}
+
+TEST_F(MachineTest, ARenamedLinkIsKnownByItsAddressAndTheAddressesEnd) {
+    facts_.clients.leases = {lease("before", "192.0.2.3")};
+    EXPECT_EQ(machine().interfaces()[1].leases.size(), 1U);
+    for (const std::int64_t offset : {-11, 11}) {
+        facts_.clients.leases[0].expires = now + 600 + offset;
+        EXPECT_EQ(machine().interfaces()[1].leases.size(), 0U) << offset;
+    }
+    facts_.clients.leases[0].expires = std::nullopt;
+    EXPECT_EQ(machine().interfaces()[1].leases.size(), 0U);
+}
+
+TEST_F(MachineTest, ARenamedLinkOfUdhcpcHasAnAddressWithoutAnEnd) {
+    facts_.clients.leases = {lease("before", "192.0.2.3")};
+    facts_.clients.leases[0].client = Client::Udhcpc;
+    facts_.clients.leases[0].clientAlive = true;
+    facts_.addresses[1].validLifetime = Address::infinite;
+    EXPECT_EQ(machine().interfaces()[1].leases.size(), 1U);
+    facts_.clients.leases[0].clientAlive = false;
+    EXPECT_EQ(machine().interfaces()[1].leases.size(), 0U);
+    facts_.clients.leases[0].clientAlive = true;
+    facts_.clients.leases[0].client = Client::Dhclient;
+    EXPECT_EQ(machine().interfaces()[1].leases.size(), 0U);
+}
+
+TEST_F(MachineTest, AClientThatNamesNoLinkMeansTheOneThatHasItsAddress) {
+    facts_.clients.leases = {lease("", "192.0.2.3")};
+    EXPECT_EQ(first().leases.size(), 0U);
+    EXPECT_THAT(machine().interfaces()[1].leases, ElementsAre(Pointee(facts_.clients.leases[0])));
+    facts_.addresses[0].text = "192.0.2.3";
+    EXPECT_EQ(machine().interfaces()[1].leases.size(), 0U) << "two links have it";
+}
+
+TEST_F(MachineTest, WhatTheKernelWasGivenIsTheOnlyAddressThatNobodyElseSpeaksFor) {
+    facts_.clients.boot = {.bootp = true, .server = "192.0.2.1", .origin = "pnp"};
+    for (Address& address : facts_.addresses) {
+        address.validLifetime = Address::infinite;
+    }
+    EXPECT_THAT(first().leases, IsEmpty()) << "there are two";
+    facts_.addresses[1] = {.ifindex = 3, .family = AF_INET6, .text = "2001:db8::3"};
+    EXPECT_THAT(first().leases, ElementsAre(Pointee(Lease{.client = Client::KernelBoot,
+                                                          .interfaceName = "",
+                                                          .ifindex = 2,
+                                                          .family = AF_INET,
+                                                          .address = "192.0.2.2",
+                                                          .server = "192.0.2.1",
+                                                          .bootp = true,
+                                                          .expires = Lease::never,
+                                                          .origin = "pnp"})));
+    facts_.addresses[0].validLifetime = 600;
+    EXPECT_THAT(first().leases, IsEmpty()) << "the kernel's has no end";
+    facts_.addresses[0].validLifetime = Address::infinite;
+    facts_.clients.configurations = {{.client = Client::Ifupdown,
+                                      .interfaceName = "eth2",
+                                      .dhcp4 = false,
+                                      .dhcp6 = {},
+                                      .staticAddresses = {}}};
+    EXPECT_THAT(first().leases, IsEmpty());
+    facts_.clients.configurations.clear();
+    facts_.clients.processes = {
+        {.client = Client::Udhcpc, .interfaces = {"eth2"}, .leaseFile = ""}};
+    EXPECT_THAT(first().leases, IsEmpty());
+    facts_.clients.processes.clear();
+    facts_.addresses.clear();
+    EXPECT_THAT(first().leases, IsEmpty());
+}
+
+TEST_F(MachineTest, AClientThatNamesLinksByIndexIsTakenAtItsWord) {
+    facts_.clients.leases = {lease("", "192.0.2.3")};
+    facts_.clients.leases[0].ifindex = 9;
+    EXPECT_EQ(machine().interfaces()[1].leases.size(), 0U);
+}
+
+TEST_F(MachineTest, TheFirstConfigurationOfALinkCounts) {
+    const LinkConfiguration one{.client = Client::Ifupdown,
+                                .interfaceName = "eth2",
+                                .dhcp4 = true,
+                                .dhcp6 = {},
+                                .staticAddresses = {}};
+    LinkConfiguration other = one;
+    other.client = Client::Ifcfg;
+    facts_.clients.configurations = {one, other};
+    EXPECT_THAT(first().configuration, Pointee(one));
+    EXPECT_EQ(machine().interfaces()[1].configuration, nullptr);
+}
+
+TEST_F(MachineTest, ASocketBelongsToTheLinkOfItsAddress) {
+    facts_.clients.sockets = {{.address = "192.0.2.3", .peer = "192.0.2.1"},
+                              {.address = "192.0.2.99", .peer = ""}};
+    EXPECT_EQ(first().socket, nullptr);
+    EXPECT_THAT(machine().interfaces()[1].socket, Pointee(facts_.clients.sockets[0]));
+}
+
+TEST_F(MachineTest, ASocketOfAllLinksTellsOfThoseThatAreHeardWhileNoClientIsSeen) {
+    facts_.clients.sockets = {{.address = "", .peer = ""}};
+    EXPECT_EQ(first().openSocket, nullptr);
+    facts_.clients.packetLinks = {2, 77};
+    EXPECT_NE(first().openSocket, nullptr);
+    EXPECT_EQ(machine().interfaces()[1].openSocket, nullptr);
+    facts_.clients.processes = {
+        {.client = Client::Dhclient, .interfaces = {"eth3"}, .leaseFile = ""}};
+    EXPECT_EQ(first().openSocket, nullptr);
+    facts_.clients.processes[0].ipv6 = true;
+    EXPECT_NE(first().openSocket, nullptr);
+}
+
+}  // namespace
+}  // namespace ZR::Live

@@ -1,0 +1,88 @@
+#include "clients/Ipconfig.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <sys/socket.h>
+
+#include "LinuxSupport.h"
+
+namespace ZR::Live {
+namespace {
+
+using Protocol = IpconfigResult::Protocol;
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+TEST(IpconfigResult, CapturedDhcp) {
+    EXPECT_EQ(parseIpconfig(sample("klibc-ipconfig/run-net-eth1.conf.dhcp")),
+              (IpconfigResult{.interfaceName = "eth1",
+                              .protocol = Protocol::Dhcp,
+                              .address = "203.0.113.140",
+                              .server = "203.0.113.1",
+                              .leaseTime = 1200}));
+}
+
+TEST(IpconfigResult, CapturedBootp) {
+    EXPECT_EQ(parseIpconfig(sample("klibc-ipconfig/run-net-eth1.conf.bootp")),
+              (IpconfigResult{.interfaceName = "eth1",
+                              .protocol = Protocol::Bootp,
+                              .address = "203.0.113.140",
+                              .server = "203.0.113.1",
+                              .leaseTime = 0}));
+}
+
+TEST(IpconfigResult, NewerVersionsCallTheProtocolOtherwise) {
+    EXPECT_EQ(parseIpconfig("IPV4PROTO='dhcp'\n").protocol, Protocol::Dhcp);
+    EXPECT_EQ(parseIpconfig("IPV4PROTO='none'\n").protocol, Protocol::Other);
+}
+
+TEST(IpconfigResult, AllZerosAreNoAddress) {
+    const IpconfigResult result = parseIpconfig("IPV4ADDR='0.0.0.0'\nROOTSERVER='0.0.0.0'\n");
+    EXPECT_EQ(result.address, "");
+    EXPECT_EQ(result.server, "");
+}
+
+class IpconfigTest : public testing::Test {
+  protected:
+    [[nodiscard]] ClientFacts read() const { return readWith(readIpconfig, root_); }
+    void write(const std::string& content) const {
+        root_.write("/run/net-eth1.conf", content);
+        root_.age("/run/net-eth1.conf", 1'000'000);
+    }
+    [[nodiscard]] Lease lease(bool bootp, std::int64_t expires) const {
+        return {.client = Client::Ipconfig,
+                .interfaceName = "eth1",
+                .family = AF_INET,
+                .address = "203.0.113.140",
+                .server = "203.0.113.1",
+                .bootp = bootp,
+                .expires = expires,
+                .outlivesEnd = true,
+                .origin = root_.path("/run/net-eth1.conf")};
+    }
+
+    TemporaryDirectory root_;
+};
+
+TEST_F(IpconfigTest, OnAMachineThatDidNotBootSoThereIsNothing) {
+    EXPECT_EQ(read(), ClientFacts{});
+}
+
+TEST_F(IpconfigTest, ALeaseOutlivesItsEndAndOneOfBootpHasNone) {
+    write(sample("klibc-ipconfig/run-net-eth1.conf.dhcp"));
+    EXPECT_THAT(read().leases, ElementsAre(lease(false, 1'001'200)));
+    write(sample("klibc-ipconfig/run-net-eth1.conf.bootp"));
+    EXPECT_THAT(read().leases, ElementsAre(lease(true, Lease::never)));
+}
+
+TEST_F(IpconfigTest, AnAddressThatWasGivenByHandIsNoLease) {
+    write("DEVICE=eth1\nPROTO='none'\nIPV4ADDR='192.0.2.7'\n");
+    EXPECT_THAT(read().leases, IsEmpty());
+    write("DEVICE='a b'\nPROTO='dhcp'\nIPV4ADDR='192.0.2.7'\n");
+    EXPECT_THAT(read().leases, IsEmpty());
+    write("DEVICE=eth1\nPROTO='dhcp'\n");
+    EXPECT_THAT(read().leases, IsEmpty());
+}
+
+}  // namespace
+}  // namespace ZR::Live

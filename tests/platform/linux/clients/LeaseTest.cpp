@@ -1,0 +1,73 @@
+#include "clients/Lease.h"
+
+#include <gtest/gtest.h>
+
+#include <set>
+
+#include "LinuxSupport.h"
+
+namespace ZR::Live {
+namespace {
+
+TEST(ClientNames, AreAllDifferent) {
+    std::set<std::string_view> names;
+    for (const Client client :
+         {Client::Networkd, Client::NetworkManager, Client::Wicked, Client::Dhclient,
+          Client::Dhcpcd, Client::Udhcpc, Client::Dhcp6c, Client::Ipconfig, Client::Netplan,
+          Client::Ifupdown, Client::Ifcfg, Client::Connman, Client::KernelBoot}) {
+        EXPECT_TRUE(names.insert(nameOf(client)).second) << nameOf(client);
+        EXPECT_NE(nameOf(client), "unknown");
+    }
+}
+
+TEST(ClientFacts, AManagerOfAnotherNamespaceDoesNotRunHere) {
+    using Where = ManagerProcess::Where;
+    EXPECT_TRUE(running(Client::Wicked).runs(Client::Wicked));
+    EXPECT_TRUE(running(Client::Wicked, Where::Unknown).runs(Client::Wicked));
+    EXPECT_FALSE(running(Client::Wicked, Where::Elsewhere).runs(Client::Wicked));
+    EXPECT_FALSE(running(Client::Wicked).runs(Client::Networkd));
+    EXPECT_FALSE(ClientFacts{}.runs(Client::Wicked));
+}
+
+TEST(ClientFacts, SocketsStandAloneWhereNoProgramThatCouldHaveThemIsSeen) {
+    ClientFacts facts;
+    EXPECT_FALSE(facts.socketsStandAlone());
+    facts.sockets = {{.address = "192.0.2.7", .peer = ""}};
+    EXPECT_TRUE(facts.socketsStandAlone());
+    facts.managers = running(Client::Networkd, ManagerProcess::Where::Elsewhere).managers;
+    facts.processes = {{.client = Client::Dhcp6c, .interfaces = {}, .leaseFile = "", .ipv6 = true}};
+    EXPECT_TRUE(facts.socketsStandAlone());
+    facts.processes[0].ipv6 = false;
+    EXPECT_FALSE(facts.socketsStandAlone());
+    facts.processes.clear();
+    facts.managers = running(Client::Networkd).managers;
+    EXPECT_FALSE(facts.socketsStandAlone());
+}
+
+TEST(ClientFacts, AManagerRunsElsewhereWhereItRunsInNoOtherPlace) {
+    using Where = ManagerProcess::Where;
+    ClientFacts facts = running(Client::Wicked, Where::Elsewhere);
+    EXPECT_TRUE(facts.runsElsewhere(Client::Wicked));
+    EXPECT_FALSE(facts.runsElsewhere(Client::Networkd));
+    facts.managers.push_back({.client = Client::Wicked, .where = Where::Here, .pid = 8});
+    EXPECT_FALSE(facts.runsElsewhere(Client::Wicked));
+    EXPECT_FALSE(ClientFacts{}.runsElsewhere(Client::Wicked));
+}
+
+TEST(ClientProcesses, WithoutAnInterfaceTheyServeAll) {
+    ClientProcess process{.client = Client::Dhclient, .interfaces = {}, .leaseFile = ""};
+    EXPECT_TRUE(process.serves("eth1"));
+    process.interfaces = {"eth2", "eth3"};
+    EXPECT_TRUE(process.serves("eth3"));
+    EXPECT_FALSE(process.serves("eth1"));
+}
+
+TEST(WatchedPlaces, AShorterPrefixCoversALongerOne) {
+    const WatchedPlace place{.directory = "/d", .namePrefix = "a"};
+    EXPECT_TRUE(place.covers({.directory = "/d", .namePrefix = "ab"}));
+    EXPECT_FALSE(place.covers({.directory = "/d", .namePrefix = ""}));
+    EXPECT_FALSE(place.covers({.directory = "/e", .namePrefix = "a"}));
+}
+
+}  // namespace
+}  // namespace ZR::Live

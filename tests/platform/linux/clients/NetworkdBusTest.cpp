@@ -1,0 +1,163 @@
+#include "clients/NetworkdBus.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <sys/socket.h>
+#include <sys/un.h>
+
+#include <cstdlib>
+#include <cstring>
+
+#include "LinuxSupport.h"
+#include "kit/ChildProcess.h"
+#include "zrcommon/UniqueFd.h"
+
+namespace ZR::Live {
+namespace {
+
+using testing::ElementsAre;
+using Testing::inChild;
+using testing::IsEmpty;
+
+std::vector<NetworkdAddress> parse(const std::string& json) {
+    const auto parsed = parseNetworkdDescription(json);
+    const auto* const facts = std::get_if<std::vector<NetworkdAddress>>(&parsed);
+    EXPECT_NE(facts, nullptr) << std::get<std::string_view>(parsed);
+    return facts == nullptr ? std::vector<NetworkdAddress>{} : *facts;
+}
+
+NetworkdAddress address(std::uint8_t family, const std::string& text, const std::string& source,
+                        const std::string& provider = "", std::uint32_t ifindex = 2) {
+    return {.ifindex = ifindex,
+            .family = family,
+            .address = text,
+            .source = source,
+            .provider = provider};
+}
+
+TEST(NetworkdDescription, CapturedByVersion252) {
+    EXPECT_THAT(
+        parse(sample("networkd/networkctl-status-eth1.json")),
+        ElementsAre(address(AF_INET6, "fe80::5054:ff:fe00:5", "foreign"),
+                    address(AF_INET, "198.51.100.110", "DHCPv4", "198.51.100.1"),
+                    address(AF_INET6, "2001:db8:99::1b2", "DHCPv6", "fe80::e0cb:10ff:feee:2799")));
+}
+
+TEST(NetworkdDescription, CapturedByVersion257) {
+    EXPECT_THAT(
+        parse(sample("networkd-257/networkctl-status-eth1.json")),
+        ElementsAre(address(AF_INET6, "2001:db8:99::1d3", "DHCPv6", "fe80::e0cb:10ff:feee:2799"),
+                    address(AF_INET6, "fe80::5054:ff:fe00:6", "foreign"),
+                    address(AF_INET, "198.51.100.111", "DHCPv4", "198.51.100.1")));
+}
+
+TEST(NetworkdDescription, CapturedStaticAndLinkLocal) {
+    EXPECT_THAT(parse(sample("networkd/networkctl-static-linklocal.json")),
+                ElementsAre(address(AF_INET6, "fe80::c452:2fff:fee3:97d", "foreign", "", 3),
+                            address(AF_INET, "169.254.105.80", "IPv4LL", "", 3),
+                            address(AF_INET, "198.51.100.30", "static", "", 3)));
+}
+
+TEST(NetworkdDescription, OfAllLinksAtOnce) {
+    EXPECT_THAT(parse(R"({"Interfaces":[
+        {"Index":1,"Addresses":[{"Family":2,"Address":[127,0,0,1],"ConfigSource":"foreign"}]},
+        {"Index":7},
+        {"Index":2,"Addresses":[{"Family":2,"Address":[192,0,2,7],"ConfigSource":"static"}]}]})"),
+                ElementsAre(address(AF_INET, "127.0.0.1", "foreign", "", 1),
+                            address(AF_INET, "192.0.2.7", "static")));
+}
+
+TEST(NetworkdDescription, WhatIsNoAddressIsSkipped) {
+    EXPECT_THAT(parse(R"({"Index":2,"Addresses":[7,{},{"Family":2},{"Family":2,"Address":"x"},
+        {"Family":2,"Address":[1,2,3]},{"Family":2,"Address":[1,2,3,256]},
+        {"Family":2,"Address":[1,2,3,-4]},{"Family":10,"Address":[1,2,3,4]},
+        {"Family":300,"Address":[1,2,3,4]},{"Family":"2","Address":[1,2,3,4]},
+        {"Family":2,"Address":[192,0,2,7],"ConfigSource":7,"ConfigProvider":[1]}]})"),
+                ElementsAre(address(AF_INET, "192.0.2.7", "")));
+    EXPECT_THAT(parse("{}"), IsEmpty());
+    EXPECT_THAT(parse(R"({"Index":-2,"Addresses":[]})"), IsEmpty());
+    EXPECT_THAT(parse(R"({"Index":2,"Addresses":{}})"), IsEmpty());
+}
+
+TEST(NetworkdDescription, OtherTextsHaveAReason) {
+    for (const char* text : {"", "[]", "7", "{", "\"x\"", "{\"Index\":2,\"Addresses\":["}) {
+        EXPECT_TRUE(std::holds_alternative<std::string_view>(parseNetworkdDescription(text)))
+            << text;
+    }
+}
+
+TEST(AddNetworkdDescription, AddsLeasesThatTheFilesDoNotTell) {
+    ClientFacts facts;
+    facts.leases = {{.client = Client::Networkd,
+                     .interfaceName = "",
+                     .ifindex = 2,
+                     .family = AF_INET,
+                     .address = "198.51.100.110",
+                     .server = "198.51.100.1",
+                     .expires = {},
+                     .origin = "the file"}};
+    const std::vector<Lease> expected{facts.leases[0],
+                                      {.client = Client::Networkd,
+                                       .interfaceName = "",
+                                       .ifindex = 2,
+                                       .family = AF_INET6,
+                                       .address = "2001:db8:99::1b2",
+                                       .server = "fe80::e0cb:10ff:feee:2799",
+                                       .clientAlive = true,
+                                       .expires = {},
+                                       .origin = "D-Bus org.freedesktop.network1"}};
+    addNetworkdDescription(parse(sample("networkd/networkctl-status-eth1.json")), facts);
+    EXPECT_EQ(facts.leases, expected);
+}
+
+TEST(AddNetworkdDescription, AddsAddressesThatAreStaticOnce) {
+    ClientFacts facts;
+    facts.managements = {{.client = Client::Networkd,
+                          .ifindex = 3,
+                          .dhcp4 = false,
+                          .dhcp6 = false,
+                          .staticAddresses = {}}};
+    const auto described = parse(sample("networkd/networkctl-static-linklocal.json"));
+    addNetworkdDescription(described, facts);
+    addNetworkdDescription(described, facts);
+    EXPECT_THAT(facts.managements[0].staticAddresses, ElementsAre("198.51.100.30"));
+    EXPECT_THAT(facts.leases, IsEmpty());
+}
+
+/// The answer of a machine whose system bus is at an address; in a process of its own,
+/// for the address is given by the environment.
+std::string answerOf(const std::string& bus, std::chrono::milliseconds time) {
+    const auto result = inChild([&] {
+        ::setenv("DBUS_SYSTEM_BUS_ADDRESS", bus.c_str(), 1);
+        const auto start = std::chrono::steady_clock::now();
+        const NetworkdAnswer answer = askNetworkd(start + time);
+        const bool late = std::chrono::steady_clock::now() - start > std::chrono::seconds{5};
+        return answer.json + '|' + answer.reason + (late ? " (late)" : "");
+    });
+    return result.output;
+}
+
+TEST(AskNetworkd, WithoutABusNobodyIsAsked) {
+    const TemporaryDirectory directory;
+    EXPECT_EQ(answerOf("unix:path=" + directory.path("/none"), std::chrono::milliseconds{100}),
+              "|");
+}
+
+TEST(AskNetworkd, ABusThatNeverAnswersHoldsNobodyUp) {
+    // Connections wait in the queue of a socket that nobody takes them from.
+    const TemporaryDirectory directory;
+    const std::string path = directory.path("/bus");
+    const UniqueFd listener{::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0)};
+    sockaddr_un name{};
+    name.sun_family = AF_UNIX;
+    ASSERT_LT(path.size(), sizeof name.sun_path);
+    std::memcpy(&name.sun_path[0], path.c_str(), path.size());
+    const auto* const generic = static_cast<const sockaddr*>(static_cast<const void*>(&name));
+    ASSERT_EQ(::bind(listener.get(), generic, sizeof name), 0);
+    ASSERT_EQ(::listen(listener.get(), 8), 0);
+    EXPECT_EQ(answerOf("unix:path=" + path, std::chrono::milliseconds{50}),
+              "|systemd-networkd cannot be asked: Connection timed out");
+}
+
+}  // namespace
+}  // namespace ZR::Live

@@ -1,0 +1,178 @@
+// wicked does not exist for Debian, so its files here are written after its own
+// description of them and not captured.
+
+#include "clients/Wicked.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <sys/socket.h>
+
+#include "LinuxSupport.h"
+
+namespace ZR::Live {
+namespace {
+
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::IsEmpty;
+
+constexpr const char* lease4 = R"(<?xml version="1.0"?>
+<!-- <state>released</state> -->
+<lease>
+  <family>ipv4</family>
+  <type>dhcp</type>
+  <owner>dhcp4</owner>
+  <uuid>11111111-2222-4333-8444-555555555555</uuid>
+  <state>granted</state>
+  <acquired>1000000</acquired>
+  <empty/>
+  <addresses>
+    <address><local>198.51.100.7/24</local></address>
+  </addresses>
+  <ipv4:dhcp>
+    <server-id>198.51.100.1</server-id>
+    <relay-address>198.51.100.2</relay-address>
+    <lease-time>600</lease-time>
+    <renewal-time>300</renewal-time>
+    <address>198.51.100.7</address>
+    <netmask>255.255.255.0</netmask>
+  </ipv4:dhcp>
+</lease>
+)";
+
+constexpr const char* lease6 = R"(<lease>
+  <family>ipv6</family>
+  <type>dhcp</type>
+  <state>granted</state>
+  <acquired>1000000</acquired>
+  <ipv6:dhcp>
+    <server-id>00:01:00:01:32:93</server-id>
+    <server-address>fe80::1%eth1</server-address>
+    <ia-na>
+      <interface-id>1</interface-id>
+      <acquired>1000050</acquired>
+      <ia-addr>
+        <address>2001:db8::7</address>
+        <preferred-lft>300</preferred-lft>
+        <valid-lft>600</valid-lft>
+      </ia-addr>
+    </ia-na>
+  </ipv6:dhcp>
+</lease>
+)";
+
+std::string with(std::string text, const std::string& from, const std::string& to) {
+    return text.replace(text.find(from), from.size(), to);
+}
+
+WickedLease parse(const std::string& xml) {
+    const auto parsed = parseWickedLease(xml);
+    return std::get<WickedLease>(parsed);
+}
+
+TEST(WickedLease, OfIPv4) {
+    EXPECT_EQ(
+        parse(lease4),
+        (WickedLease{
+            .family = AF_INET,
+            .type = "dhcp",
+            .state = "granted",
+            .server = "198.51.100.1",
+            .addresses = {{.address = "198.51.100.7", .acquired = 1'000'000, .lifetime = 600}}}));
+}
+
+TEST(WickedLease, OfIPv6NamesTheSenderOfTheServersMessages) {
+    EXPECT_EQ(
+        parse(lease6),
+        (WickedLease{
+            .family = AF_INET6,
+            .type = "dhcp",
+            .state = "granted",
+            .server = "fe80::1",
+            .addresses = {{.address = "2001:db8::7", .acquired = 1'000'050, .lifetime = 600}}}));
+}
+
+TEST(WickedLease, EveryBeginningIsTornOrEmpty) {
+    const std::string whole = lease4;
+    const std::size_t end = whole.rfind("</lease>") + 8;
+    for (std::size_t size = 0; size < end; ++size) {
+        const auto parsed = parseWickedLease(whole.substr(0, size));
+        if (const auto* const facts = std::get_if<WickedLease>(&parsed)) {
+            EXPECT_THAT(facts->addresses, IsEmpty()) << size;
+        }
+    }
+}
+
+TEST(WickedLease, OtherTextsGiveAReasonOrNothing) {
+    EXPECT_EQ(parse(""), (WickedLease{.type = "", .state = "", .server = "", .addresses = {}}));
+    EXPECT_EQ(parse("text").addresses.size(), 0U);
+    for (const char* text : {"<lease>", "<lease", "</lease>", "<a></b>", "<!-- <a>"}) {
+        EXPECT_TRUE(std::holds_alternative<std::string_view>(parseWickedLease(text))) << text;
+    }
+    std::string deep;
+    for (int i = 0; i < 100'000; ++i) {
+        deep += "<a>";
+    }
+    EXPECT_EQ(std::get<std::string_view>(parseWickedLease(deep)), "elements lie too deep");
+}
+
+class WickedTest : public testing::Test {
+  protected:
+    static constexpr const char* file = "/var/lib/wicked/lease-eth1-dhcp-ipv4.xml";
+
+    [[nodiscard]] ClientFacts read(ClientFacts facts = {}) const {
+        return readWith(readWicked, root_, std::move(facts));
+    }
+
+    TemporaryDirectory root_;
+};
+
+TEST_F(WickedTest, ALeaseIsTheFilesInterfacesOwn) {
+    root_.write(file, lease4);
+    Lease expected{.client = Client::Wicked,
+                   .interfaceName = "eth1",
+                   .family = AF_INET,
+                   .address = "198.51.100.7",
+                   .server = "198.51.100.1",
+                   .expires = 1'000'600,
+                   .origin = root_.path(file)};
+    EXPECT_THAT(read().leases, ElementsAre(expected));
+    expected.clientAlive = true;
+    EXPECT_THAT(read(running(Client::Wicked)).leases, ElementsAre(expected));
+}
+
+TEST_F(WickedTest, BothPlacesAndProtocolsAreRead) {
+    root_.write("/run/wicked/lease-a-b-dhcp-ipv6.xml", lease6);
+    EXPECT_THAT(read().leases,
+                ElementsAre(Lease{.client = Client::Wicked,
+                                  .interfaceName = "a-b",
+                                  .family = AF_INET6,
+                                  .address = "2001:db8::7",
+                                  .server = "fe80::1",
+                                  .expires = 1'000'650,
+                                  .origin = root_.path("/run/wicked/lease-a-b-dhcp-ipv6.xml")}));
+}
+
+TEST_F(WickedTest, OnlyWhatIsGrantedByDhcpWithATimeIsALease) {
+    for (const std::string& content :
+         {with(lease4, ">granted<", ">released<"), with(lease4, ">dhcp<", ">static<"),
+          with(lease4, "<lease-time>600</lease-time>", ""), with(lease4, ">ipv4<", ">ipx<"),
+          with(lease4, ">1000000<", ">soon<")}) {
+        root_.write(file, content);
+        EXPECT_THAT(read().leases, IsEmpty()) << content;
+    }
+    root_.write(file, with(lease4, ">600<", ">4294967295<"));
+    EXPECT_EQ(read().leases.at(0).expires, Lease::never);
+}
+
+TEST_F(WickedTest, ATornFileIsReportedAndOthersAreNotLookedAt) {
+    root_.write(file, "<lease>");
+    root_.write("/var/lib/wicked/lease-eth1-auto-ipv6.xml", lease6);
+    root_.write("/var/lib/wicked/lease--dhcp-ipv4.xml", lease4);
+    root_.write("/var/lib/wicked/duid.xml", lease4);
+    EXPECT_THAT(read().leases, IsEmpty());
+    EXPECT_THAT(read().complaints, ElementsAre(HasSubstr("the file ends within an element")));
+}
+
+}  // namespace
+}  // namespace ZR::Live

@@ -1,0 +1,66 @@
+#include "formats/Files.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include "LinuxSupport.h"
+
+namespace ZR::Live {
+namespace {
+
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+TEST(Files, AbsentFilesAndDirectoriesAreNoComplaint) {
+    const TemporaryDirectory root;
+    std::vector<std::string> complaints;
+    EXPECT_EQ(readOptionalFile(root.path("/none"), complaints), std::nullopt);
+    EXPECT_THAT(listOptionalDirectory(root.path("/none/there"), complaints), IsEmpty());
+    EXPECT_THAT(complaints, IsEmpty());
+}
+
+TEST(Files, NamesAreSortedAndHalfWrittenFilesLeftOut) {
+    const TemporaryDirectory root;
+    for (const char* name : {"/b", "/.#b1234", "/a"}) {
+        root.write(name, "");
+    }
+    std::vector<std::string> complaints;
+    EXPECT_THAT(listOptionalDirectory(root.path(), complaints), ElementsAre("a", "b"));
+}
+
+TEST(Files, WhatMayNotBeReadIsAComplaint) {
+    constexpr uid_t nobody = 65534;
+    const TemporaryDirectory root;
+    root.write("/file", "x");
+    std::filesystem::create_directories(root.path("/directory"));
+    ASSERT_EQ(::chmod(root.path().c_str(), 0755), 0);
+    ASSERT_EQ(::chmod(root.path("/file").c_str(), 0), 0);
+    ASSERT_EQ(::chmod(root.path("/directory").c_str(), 0), 0);
+    const uid_t user = ::geteuid();
+    if (user == 0) {  // who may read everything
+        ASSERT_EQ(::seteuid(nobody), 0);
+    }
+    std::vector<std::string> complaints;
+    const auto content = readOptionalFile(root.path("/file"), complaints);
+    const auto names = listOptionalDirectory(root.path("/directory"), complaints);
+    ASSERT_EQ(::seteuid(user), 0);
+    ASSERT_EQ(::chmod(root.path("/directory").c_str(), 0700), 0);  // else it could not be removed
+    EXPECT_EQ(content, std::nullopt);
+    EXPECT_THAT(names, IsEmpty());
+    EXPECT_THAT(complaints,
+                ElementsAre("cannot read " + root.path("/file") + ": Permission denied",
+                            "cannot read " + root.path("/directory") + ": Permission denied"));
+}
+
+TEST(Files, AFileBeyondAllMeasureIsAComplaint) {
+    const TemporaryDirectory root;
+    root.write("/large", std::string((std::size_t{4} << 20U) + 1, 'x'));
+    std::vector<std::string> complaints;
+    EXPECT_EQ(readOptionalFile(root.path("/large"), complaints), std::nullopt);
+    EXPECT_EQ(complaints.size(), 1U);
+}
+
+}  // namespace
+}  // namespace ZR::Live

@@ -1,0 +1,120 @@
+#include "kernel/InterfaceRules.h"
+
+#include <gtest/gtest.h>
+#include <linux/if.h>
+#include <linux/if_arp.h>
+
+namespace ZR::Live {
+namespace {
+
+Link linkOf(const char* kind, const char* slaveKind = "") {
+    Link link;
+    link.ifindex = 2;
+    link.name = "l";
+    link.arphrdType = ARPHRD_ETHER;
+    link.kind = kind;
+    link.slaveKind = slaveKind;
+    link.master = link.slaveKind.empty() ? 0 : 9;
+    return link;
+}
+
+bool isActiveWith(std::uint32_t flags, std::uint8_t operstate) {
+    Link link = linkOf("");
+    link.flags = flags;
+    link.operstate = operstate;
+    return isActive(link);
+}
+
+TEST(InterfaceRules, LoopbackIsNoInterface) {
+    Link link = linkOf("");
+    link.flags = IFF_LOOPBACK;
+    EXPECT_FALSE(isNetworkInterface(link, true));
+    link.flags = 0;
+    link.arphrdType = ARPHRD_LOOPBACK;
+    EXPECT_FALSE(isNetworkInterface(link, true));
+}
+
+TEST(InterfaceRules, DevicesOnABusAreAlwaysInterfaces) {
+    for (const char* slaveKind : {"", "bond", "bridge"}) {
+        Link link = linkOf("", slaveKind);
+        link.hasParentDevice = true;
+        EXPECT_TRUE(isNetworkInterface(link, false)) << slaveKind;
+    }
+    Link tunnel = linkOf("wireguard");
+    tunnel.hasParentDevice = true;
+    EXPECT_TRUE(isNetworkInterface(tunnel, false));
+}
+
+TEST(InterfaceRules, LinksOfUnknownDriversAreInterfaces) {
+    EXPECT_TRUE(isNetworkInterface(linkOf(""), false));
+}
+
+TEST(InterfaceRules, VirtualLinksThatHoldAddressesAreInterfaces) {
+    for (const char* kind : {"bridge", "bond", "team", "vlan", "macvlan", "ipvlan", "ipoib"}) {
+        EXPECT_TRUE(isNetworkInterface(linkOf(kind), false)) << kind;
+    }
+}
+
+TEST(InterfaceRules, TunnelsTestDevicesAndUnknownKindsAreNone) {
+    for (const char* kind :
+         {"vrf", "tun", "wireguard", "ppp", "gre", "gretap", "sit", "ip6tnl", "vti", "xfrm",
+          "vxlan", "geneve", "dummy", "ifb", "nlmon", "netdevsim", "can", "something-new"}) {
+        EXPECT_FALSE(isNetworkInterface(linkOf(kind), true)) << kind;
+    }
+}
+
+TEST(InterfaceRules, AnEndOfAVirtualCableIsAnInterfaceWhereItHasAnAddress) {
+    EXPECT_TRUE(isNetworkInterface(linkOf("veth"), true));
+    EXPECT_FALSE(isNetworkInterface(linkOf("veth"), false));
+    EXPECT_FALSE(isNetworkInterface(linkOf("veth", "bridge"), true));
+    EXPECT_FALSE(isNetworkInterface(linkOf("veth", "openvswitch"), true));
+    EXPECT_TRUE(isNetworkInterface(linkOf("veth", "vrf"), true));
+}
+
+TEST(InterfaceRules, PortsOfLinksThatOwnTheirAddressesAreEnslaved) {
+    for (const char* master : {"bond", "bridge", "team", "openvswitch"}) {
+        EXPECT_TRUE(isEnslaved(linkOf("", master))) << master;
+    }
+    EXPECT_FALSE(isEnslaved(linkOf("", "vrf")));
+    EXPECT_FALSE(isEnslaved(linkOf("")));
+}
+
+TEST(InterfaceRules, ActiveIsUpWithAnOperationalStateOfUp) {
+    constexpr std::uint32_t up = IFF_UP;
+    constexpr std::uint32_t lower = IFF_LOWER_UP;
+    EXPECT_TRUE(isActiveWith(up | lower, IF_OPER_UP));
+    EXPECT_FALSE(isActiveWith(lower, IF_OPER_UP));
+    EXPECT_FALSE(isActiveWith(up, IF_OPER_DOWN));
+    EXPECT_FALSE(isActiveWith(up, IF_OPER_LOWERLAYERDOWN));
+    EXPECT_FALSE(isActiveWith(up | lower, IF_OPER_DORMANT));
+    EXPECT_FALSE(isActiveWith(0, IF_OPER_DOWN));
+}
+
+TEST(InterfaceRules, DriversThatReportNoStateAreActiveWithTheirLowerLayerUp) {
+    EXPECT_TRUE(isActiveWith(std::uint32_t{IFF_UP} | IFF_LOWER_UP, IF_OPER_UNKNOWN));
+    EXPECT_FALSE(isActiveWith(IFF_UP, IF_OPER_UNKNOWN));
+    EXPECT_FALSE(isActiveWith(IFF_LOWER_UP, IF_OPER_UNKNOWN));
+    Link carrier = linkOf("");
+    carrier.flags = IFF_UP;
+    carrier.carrier = true;
+    EXPECT_TRUE(isActive(carrier));
+}
+
+TEST(InterfaceRules, DescriptionsAreForPeople) {
+    EXPECT_EQ(describe(linkOf("")), "Ethernet interface");
+    EXPECT_EQ(describe(linkOf("bridge")), "Bridge");
+    EXPECT_EQ(describe(linkOf("bond")), "Bond");
+    EXPECT_EQ(describe(linkOf("vlan")), "VLAN");
+    EXPECT_EQ(describe(linkOf("veth")), "Virtual Ethernet interface");
+    Link wireless = linkOf("");
+    wireless.wireless = true;
+    EXPECT_EQ(describe(wireless), "Wireless interface");
+    Link other = linkOf("");
+    other.arphrdType = ARPHRD_INFINIBAND;
+    EXPECT_EQ(describe(other), "InfiniBand interface");
+    other.arphrdType = ARPHRD_NONE;
+    EXPECT_EQ(describe(other), "Network interface");
+}
+
+}  // namespace
+}  // namespace ZR::Live

@@ -1,0 +1,88 @@
+#include "kernel/Sockets.h"
+
+#include <arpa/inet.h>
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <linux/if_ether.h>
+#include <sys/socket.h>
+
+#include "LinuxSupport.h"
+#include "kit/Namespaces.h"
+#include "zrcommon/UniqueFd.h"
+
+namespace ZR::Live {
+namespace {
+
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+TEST(UdpSockets, OnlyThoseOfTheClientPort) {
+    // As the kernel of a machine of low end bytes prints them.
+    EXPECT_THAT(
+        parseUdpSockets(
+            "   sl  local_address rem_address   st tx_queue rx_queue tr tm->when retrnsmt   uid\n"
+            "  142: 076433C6:0044 016433C6:0043 01 00000000:00000000 00:00000000 00000000     0\n"
+            "  143: 00000000:0044 00000000:0000 07 00000000:00000000 00:00000000 00000000     0\n"
+            "  144: 00000000:0043 00000000:0000 07 00000000:00000000 00:00000000 00000000     0\n"),
+        ElementsAre(PortSocket{.address = "198.51.100.7", .peer = "198.51.100.1"},
+                    PortSocket{.address = "", .peer = ""}));
+}
+
+TEST(UdpSockets, AnyTextGivesFacts) {
+    for (const char* text : {"", "\n\n", "1: 2 3", "1: 2:45 3:4", "1: x:0044 0:0",
+                             "1: 00000000:0044", "1: 100000000:0044 00000000:0000"}) {
+        EXPECT_THAT(parseUdpSockets(text), IsEmpty()) << text;
+    }
+}
+
+TEST(PacketLinks, EachLinkOnceWhereIPv4IsHeard) {
+    EXPECT_THAT(parsePacketLinks("sk       RefCnt Type Proto  Iface R Rmem   User   Inode\n"
+                                 "0000000000000000 3      3    0003   2     1 0      0      1\n"
+                                 "0000000000000000 3      3    0800   3     1 0      0      2\n"
+                                 "0000000000000000 3      3    0003   2     1 0      0      3\n"
+                                 "0000000000000000 3      3    88cc   4     1 0      0      4\n"
+                                 "0000000000000000 3      3    0003   0     1 0      0      5\n"),
+                ElementsAre(2, 3));
+    EXPECT_THAT(parsePacketLinks("a b c 0003\n\nx"), IsEmpty());
+}
+
+TEST(Sockets, WithoutAProcessFileSystemThereAreNone) {
+    const TemporaryDirectory root;
+    EXPECT_EQ(readWith(readSockets, root), ClientFacts{});
+}
+
+TEST(Sockets, OfARealKernel) {
+    ZR_NEEDS_NAMESPACES();
+    EXPECT_TRUE(passesInNamespaces(30, [] {
+        ClientFacts before;
+        readSockets({}, before);
+        EXPECT_EQ(before, ClientFacts{});
+
+        run("ip link set lo up");
+        const UniqueFd client{::socket(AF_INET, SOCK_DGRAM | SOCK_CLOEXEC, 0)};
+        const auto bindTo = [](const UniqueFd& socket, const char* text, std::uint16_t port,
+                               auto call) {
+            sockaddr_in address{};
+            address.sin_family = AF_INET;
+            address.sin_port = htons(port);
+            ASSERT_EQ(::inet_pton(AF_INET, text, &address.sin_addr), 1);
+            const auto* const generic =
+                static_cast<const sockaddr*>(static_cast<const void*>(&address));
+            ASSERT_EQ(call(socket.get(), generic, sizeof address), 0);
+        };
+        bindTo(client, "127.0.0.1", 68, ::bind);
+        bindTo(client, "127.0.0.2", 67, ::connect);
+        const UniqueFd listener{
+            ::socket(AF_PACKET, SOCK_RAW | SOCK_CLOEXEC, htons(std::uint16_t{ETH_P_ALL}))};
+        ASSERT_TRUE(listener);
+        ClientFacts facts;
+        readSockets({}, facts);
+        EXPECT_THAT(facts.sockets,
+                    ElementsAre(PortSocket{.address = "127.0.0.1", .peer = "127.0.0.2"}));
+        EXPECT_THAT(facts.packetLinks, IsEmpty()) << "it hears all links";
+        EXPECT_THAT(facts.complaints, IsEmpty());
+    }));
+}
+
+}  // namespace
+}  // namespace ZR::Live

@@ -1,0 +1,55 @@
+// The library as an object manager has it: opened, asked, cleaned up and closed,
+// again and again.
+
+#include <cmpift.h>
+#include <dlfcn.h>
+#include <gtest/gtest.h>
+
+#include <filesystem>
+#include <iterator>
+
+#include "kit/Host.h"
+#include "kit/Tree.h"
+
+namespace {
+
+class UnloadTest : public test::TreeTest {};
+
+std::ptrdiff_t openDescriptors() {
+    const std::filesystem::directory_iterator entries("/proc/self/fd");
+    return std::distance(begin(entries), end(entries));
+}
+
+TEST_F(UnloadTest, AThousandLoadsLoseNoDescriptor) {
+    setTree({test::host({test::dhcpInterface("eth0")})});
+    test::Host host;
+    const char* const library = ZR_BINARY_DIR "/lib/cmpi/libDHCPClientProvider.so";
+    const std::ptrdiff_t before = openDescriptors();
+    for (int load = 0; load < 1000; ++load) {
+        void* handle = ::dlopen(library, RTLD_NOW | RTLD_LOCAL);
+        ASSERT_NE(handle, nullptr) << ::dlerror();
+        using Factory = CMPIInstanceMI* (*)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
+        const auto create =
+            reinterpret_cast<Factory>(::dlsym(handle, "DHCPClientProvider_Create_InstanceMI"));
+        ASSERT_NE(create, nullptr);
+        CMPIStatus status{CMPI_RC_OK, nullptr};
+        CMPIInstanceMI* mi = create(host.broker(), nullptr, &status);
+        // Watching the machine's files and giving that up again costs the kernel
+        // milliseconds; a request now and then is enough to lose something.
+        if (load % 50 == 0) {
+            const test::Host::Answer answer =
+                host.request(cimom::broker::ResultCollector::Kind::paths,
+                             test::pathOf("QVXZR_DHCPProtocolEndpoint"),
+                             [mi](auto* context, auto* result, auto* path) {
+                                 return mi->ft->enumerateInstanceNames(mi, context, result, path);
+                             });
+            ASSERT_EQ(answer.paths.size(), 1U);
+        }
+        EXPECT_EQ(mi->ft->cleanup(mi, nullptr, 0).rc, CMPI_RC_OK);
+        ASSERT_EQ(::dlclose(handle), 0);
+    }
+    EXPECT_EQ(openDescriptors(), before);
+    EXPECT_EQ(::dlopen(library, RTLD_NOW | RTLD_NOLOAD), nullptr) << "the library is still loaded";
+}
+
+}  // namespace

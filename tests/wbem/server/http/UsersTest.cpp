@@ -1,0 +1,124 @@
+#include "wbem/Users.h"
+
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+
+#include <stdexcept>
+
+#include "kit/Files.h"
+#include "kit/TemporaryDirectory.h"
+
+namespace cimom::wbem {
+
+using ZR::Testing::readFile;
+using ZR::Testing::writeFile;
+
+class UsersFile : public testing::Test {
+  protected:
+    void write(const std::string& text, ::mode_t mode = 0600) const {
+        writeFile(file, text);
+        ASSERT_EQ(::chmod(file.c_str(), mode), 0);
+    }
+
+    [[nodiscard]] std::string complaint() const {
+        try {
+            static_cast<void>(readUsers(file));
+        } catch (const UsersError& error) {
+            return std::string(error.what()).substr(file.size() + 2);
+        }
+        return "none";
+    }
+
+    [[nodiscard]] ::mode_t mode() const {
+        struct ::stat status {};
+        EXPECT_EQ(::stat(file.c_str(), &status), 0);
+        return status.st_mode & 07777U;
+    }
+
+    ZR::Testing::TemporaryDirectory directory;
+    const std::string file = directory / "users";
+};
+
+TEST_F(UsersFile, IsReadLineByLine) {
+    write("# comment\n\nada:modify:$y$a$b$c\nbob@lab.example:read:$6$salt$hash:with\n");
+    EXPECT_EQ(readUsers(file),
+              (std::vector<User>{{"ada", Role::modify, "$y$a$b$c"},
+                                 {"bob@lab.example", Role::read, "$6$salt$hash:with"}}));
+}
+
+TEST_F(UsersFile, WithAFaultIsRefusedWithItsLine) {
+    EXPECT_EQ(complaint(), "No such file or directory");
+    write("ada:modify:$y$a\nada\n");
+    EXPECT_EQ(complaint(), "line 2: not of the form NAME:ROLE:HASH");
+    write("ada:admin:$y$a\n");
+    EXPECT_EQ(complaint(), "line 1: not of the form NAME:ROLE:HASH");
+    write("ada:read:password\n");
+    EXPECT_EQ(complaint(), "line 1: not of the form NAME:ROLE:HASH");
+    write("a b:read:$y$a\n");
+    EXPECT_EQ(complaint(), "line 1: not of the form NAME:ROLE:HASH");
+    write("ada:read:$y$a\nada:read:$y$b\n");
+    EXPECT_EQ(complaint(), "line 2: user ada is there twice");
+    write("# nobody\n");
+    EXPECT_EQ(complaint(), "names no user; \"cimdhcp user add\" adds one");
+}
+
+TEST_F(UsersFile, ThatOthersCanReachIsRefused) {
+    for (const ::mode_t bad : {0644U, 0660U, 0602U, 0601U}) {
+        write("ada:read:$y$a\n", bad);
+        EXPECT_EQ(complaint(), "may be read or written by others; \"chmod 640\" mends that");
+    }
+    write("ada:read:$y$a\n", 0640);
+    EXPECT_EQ(complaint(), "none");
+}
+
+TEST_F(UsersFile, IsMadeForItsOwnerAlone) {
+    putUser(file, {"ada", Role::read, "$y$1"});
+    EXPECT_EQ(mode(), 0600U);
+    EXPECT_EQ(readUsers(file), (std::vector<User>{{"ada", Role::read, "$y$1"}}));
+}
+
+TEST_F(UsersFile, KeepsOtherUsersAndItsMode) {
+    write("ada:read:$y$1\nbob:read:$y$2\n", 0640);
+    putUser(file, {"ada", Role::modify, "$y$3"});
+    putUser(file, {"eve", Role::read, "$y$4"});
+    EXPECT_EQ(mode(), 0640U);
+    EXPECT_EQ(readUsers(file), (std::vector<User>{{"ada", Role::modify, "$y$3"},
+                                                  {"bob", Role::read, "$y$2"},
+                                                  {"eve", Role::read, "$y$4"}}));
+}
+
+TEST_F(UsersFile, WithAFaultIsNotOverwritten) {
+    write("broken\n");
+    EXPECT_THROW(putUser(file, {"ada", Role::read, "$y$1"}), UsersError);
+    EXPECT_EQ(readFile(file), "broken\n");
+}
+
+TEST(Passwords, AreHashedByYescryptWithASaltOfTheirOwn) {
+    const std::string hash = hashPassword("grüße");
+    EXPECT_TRUE(hash.starts_with("$y$")) << hash;
+    EXPECT_NE(hash, hashPassword("grüße"));
+    EXPECT_TRUE(passwordMatches("grüße", hash));
+    EXPECT_FALSE(passwordMatches("grüsse", hash));
+    EXPECT_FALSE(passwordMatches("", hash));
+    EXPECT_FALSE(passwordMatches("grüße", "$y$j9T$nonsense"));
+    EXPECT_FALSE(passwordMatches("grüße", "*"));
+}
+
+TEST(Passwords, HaveALengthThatCryptCanTake) {
+    EXPECT_THROW(static_cast<void>(hashPassword("")), std::invalid_argument);
+    EXPECT_THROW(static_cast<void>(hashPassword(std::string(512, 'x'))), std::invalid_argument);
+    EXPECT_THROW(static_cast<void>(hashPassword(std::string("a\0b", 3))), std::invalid_argument);
+    EXPECT_TRUE(passwordMatches(std::string(511, 'x'), hashPassword(std::string(511, 'x'))));
+    EXPECT_FALSE(passwordMatches(std::string("a\0b", 3), hashPassword("a")));
+}
+
+TEST(Passwords, BelongToUsersWithPlainNames) {
+    EXPECT_TRUE(isUserName("ada.lovelace-1@x_y"));
+    EXPECT_FALSE(isUserName(""));
+    EXPECT_FALSE(isUserName("a:b"));
+    EXPECT_FALSE(isUserName("a\nb"));
+    EXPECT_TRUE(isUserName(std::string(64, 'a')));
+    EXPECT_FALSE(isUserName(std::string(65, 'a')));
+}
+
+}  // namespace cimom::wbem

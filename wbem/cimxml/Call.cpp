@@ -1,0 +1,125 @@
+#include "cimxml/Call.h"
+
+#include <algorithm>
+
+#include "cimom/Names.h"
+#include "cimxml/Errors.h"
+#include "cimxml/ObjectReader.h"
+#include "cimxml/XmlText.h"
+
+namespace cimom::wbem {
+
+namespace {
+
+constexpr unsigned badRequest = 400;
+constexpr unsigned notImplemented = 501;
+
+/// A version that differs in its second number alone is compatible.
+void checkVersion(const XmlElement& element, const char* name, std::string_view major,
+                  const char* cimError) {
+    const std::string& version = requiredAttribute(element, name);
+    const std::string_view minor =
+        std::string_view(version).substr(std::min(version.size(), major.size()));
+    if (!version.starts_with(major) || minor.empty() ||
+        !std::all_of(minor.begin(), minor.end(), [](char c) { return isDigit(c) || c == '.'; })) {
+        throw HttpFailure(notImplemented, cimError, std::string(name) + " " + version);
+    }
+}
+
+void readParameters(XmlElement& element, Call& call) {
+    for (auto child = element.children.begin() + 1; child != element.children.end(); ++child) {
+        expectName(*child, "IPARAMVALUE");
+        expectNoText(*child);
+        Parameter parameter{requiredAttribute(*child, "NAME"), std::nullopt};
+        if (child->children.size() > 1) {
+            throw NotValid("the content of IPARAMVALUE");
+        }
+        if (!child->children.empty()) {
+            parameter.value = std::move(child->children.front());
+        }
+        call.parameters.push_back(std::move(parameter));
+    }
+}
+
+Call readMessage(XmlElement cim) {
+    expectName(cim, "CIM");
+    checkVersion(cim, "CIMVERSION", "2.", "unsupported-cim-version");
+    checkVersion(cim, "DTDVERSION", "2.", "unsupported-dtd-version");
+    const XmlElement& message = onlyChild(cim);
+    expectName(message, "MESSAGE");
+    Call call;
+    call.messageId = requiredAttribute(message, "ID");
+    checkVersion(message, "PROTOCOLVERSION", "1.", "unsupported-protocol-version");
+    call.protocolVersion = *message.attribute("PROTOCOLVERSION");
+    XmlElement& request = cim.children.front().children.empty()
+                              ? throw NotValid("the content of MESSAGE")
+                              : cim.children.front().children.front();
+    static_cast<void>(onlyChild(message));
+    if (request.name == "MULTIREQ") {
+        throw HttpFailure(notImplemented, "multiple-requests-unsupported", "several requests");
+    }
+    expectName(request, "SIMPLEREQ");
+    expectNoText(request);
+    // Correlators are for event logs, and may be passed over.
+    std::erase_if(request.children,
+                  [](const XmlElement& child) { return child.name == "CORRELATOR"; });
+    if (request.children.size() != 1) {
+        throw NotValid("the content of SIMPLEREQ");
+    }
+    XmlElement& operation = request.children.front();
+    expectNoText(operation);
+    call.intrinsic = operation.name == "IMETHODCALL";
+    if (!call.intrinsic) {
+        expectName(operation, "METHODCALL");
+        call.method = requiredAttribute(operation, "NAME");
+        return call;
+    }
+    call.method = requiredAttribute(operation, "NAME");
+    if (operation.children.empty()) {
+        throw NotValid("IMETHODCALL without LOCALNAMESPACEPATH");
+    }
+    call.nameSpace = readLocalNamespacePath(operation.children.front());
+    readParameters(operation, call);
+    return call;
+}
+
+std::string head(const Call& call) {
+    std::string text =
+        R"(<?xml version="1.0" encoding="utf-8"?><CIM CIMVERSION="2.0" DTDVERSION="2.0"><MESSAGE)";
+    appendAttribute(text, "ID", call.messageId);
+    appendAttribute(text, "PROTOCOLVERSION", "1.0");
+    text += "><SIMPLERSP>";
+    text += call.intrinsic ? "<IMETHODRESPONSE" : "<METHODRESPONSE";
+    appendAttribute(text, "NAME", call.method);
+    return text + '>';
+}
+
+}  // namespace
+
+Call readCall(std::string_view body, std::size_t maximumDepth) {
+    try {
+        return readMessage(readXml(body, maximumDepth));
+    } catch (const XmlError& error) {
+        throw HttpFailure(badRequest, "request-not-well-formed", error.what());
+    } catch (const NotValid& error) {
+        throw HttpFailure(badRequest, "request-not-valid", error.what());
+    }
+}
+
+std::string answerHead(const Call& call) {
+    return head(call);
+}
+
+std::string answerTail(const Call& call) {
+    return std::string(call.intrinsic ? "</IMETHODRESPONSE>" : "</METHODRESPONSE>") +
+           "</SIMPLERSP></MESSAGE></CIM>\n";
+}
+
+std::string errorAnswer(const Call& call, unsigned code, std::string_view description) {
+    std::string text = head(call) + "<ERROR";
+    appendAttribute(text, "CODE", std::to_string(code));
+    appendAttribute(text, "DESCRIPTION", description.empty() ? cimStatusName(code) : description);
+    return text + "/>" + answerTail(call);
+}
+
+}  // namespace cimom::wbem

@@ -1,0 +1,46 @@
+#pragma once
+
+#include <cstddef>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "cimxml/XmlDocument.h"
+
+namespace cimom::wbem {
+
+/// A parameter of an operation; without a value it is null.
+struct Parameter {
+    std::string name;
+    std::optional<XmlElement> value;
+
+    bool operator==(const Parameter&) const = default;
+};
+
+/// The operation that a request message asks for.
+struct Call {
+    std::string messageId;
+    std::string protocolVersion;
+    bool intrinsic = true;  ///< else a method of a class, whose target and parameters are not read
+    std::string method;
+    std::string nameSpace;  ///< of an intrinsic operation, components joined by slashes
+    std::vector<Parameter> parameters;
+
+    bool operator==(const Call&) const = default;
+};
+
+/// Reads the body of a request: one CIM element with a simple request (DSP0201,
+/// 5.6). Throws HttpFailure with what DSP0200, 7.3.4 has a server answer to
+/// anything else.
+[[nodiscard]] Call readCall(std::string_view body, std::size_t maximumDepth);
+
+/// What stands before and behind the result of a successful call.
+[[nodiscard]] std::string answerHead(const Call& call);
+[[nodiscard]] std::string answerTail(const Call& call);
+/// The whole answer of a call that ended with a status. An empty description
+/// becomes the status' name.
+[[nodiscard]] std::string errorAnswer(const Call& call, unsigned code,
+                                      std::string_view description);
+
+}  // namespace cimom::wbem

@@ -1,0 +1,129 @@
+#include "http/Dispatcher.h"
+
+#include <utility>
+
+#include "cimxml/Call.h"
+#include "operations/ModificationText.h"
+
+namespace cimom::wbem {
+
+namespace {
+
+constexpr unsigned badRequest = 400;
+constexpr unsigned serverFault = 500;
+constexpr unsigned serviceUnavailable = 503;
+
+}  // namespace
+
+Dispatcher::Dispatcher(ObjectManager& manager, const ServerSettings& settings, const ServerLog& log)
+    : settings_(settings),
+      log_(log),
+      operations_(manager, settings.limits,
+                  [&log](const Modification& modification) {
+                      log(LogKind::modification, modificationText(modification));
+                  }),
+      workers_(settings.limits.workers, settings.limits.waiting, settings.limits.stuck),
+      gate_(1, settings.limits.waiting),
+      timers_(1, settings.limits.waiting) {
+    if (settings_.users) {
+        authenticator_.emplace(*settings_.users);
+    }
+}
+
+void Dispatcher::dispatch(const SharedExchange& exchange) {
+    if (!authenticator_) {
+        const Caller caller{std::nullopt, exchange->address(), !settings_.readOnly};
+        runOrRefuse(workers_, exchange, [this, exchange, caller] { work(exchange, caller); });
+        return;
+    }
+    if (auto identity = authenticator_->remembered(*exchange->headers->authorization)) {
+        admit(exchange, *identity);
+        return;
+    }
+    // Checking a password is slow, on purpose: one at a time, so that wrong ones
+    // leave the workers to those who have been admitted.
+    runOrRefuse(gate_, exchange, [this, exchange] { checkPassword(exchange); });
+}
+
+void Dispatcher::checkPassword(const SharedExchange& exchange) {
+    const std::string& authorization = *exchange->headers->authorization;
+    try {
+        if (const auto identity = authenticator_->check(authorization)) {
+            admit(exchange, *identity);
+        } else {
+            refuse(exchange, authenticator_->claimedUser(authorization));
+        }
+    } catch (const std::exception& error) {
+        log_(LogKind::failure, error.what());
+        exchange->finish(HttpAnswer::failure(serverFault));
+    }
+}
+
+void Dispatcher::admit(const SharedExchange& exchange, const Identity& identity) {
+    const Caller caller{identity.name, exchange->address(),
+                        identity.role == Role::modify && !settings_.readOnly};
+    runOrRefuse(workers_, exchange, [this, exchange, caller] { work(exchange, caller); });
+}
+
+void Dispatcher::runOrRefuse(TaskPool& pool, const SharedExchange& exchange, TaskPool::Task task) {
+    if (!pool.run(std::move(task))) {
+        log_(LogKind::failure, "too many requests wait for a worker, or no worker comes back");
+        exchange->finish(HttpAnswer::failure(serviceUnavailable));
+    }
+}
+
+void Dispatcher::refuse(const SharedExchange& exchange, const std::string& who) {
+    log_(LogKind::refusal, "refused " + who + " from " + exchange->address() + ", refusal number " +
+                               std::to_string(authenticator_->countRefusal()));
+    if (!timers_.runAfter(settings_.refusalDelay,
+                          [exchange] { exchange->finish(HttpAnswer::refusal()); })) {
+        exchange->finish(HttpAnswer::failure(serviceUnavailable));
+    }
+}
+
+void Dispatcher::runAfter(TaskPool::Clock::duration delay, TaskPool::Task task) {
+    // Once stopped, the server ends: nothing needs to be done any more.
+    static_cast<void>(timers_.runAfter(delay, std::move(task)));
+}
+
+void Dispatcher::endOverdue() {
+    operations_.sessions().expire();
+    const std::size_t replaced = workers_.replaceStuck(settings_.limits.request);
+    if (replaced > 0) {
+        log_(LogKind::failure, std::to_string(replaced) +
+                                   " operations have not returned in their time; other workers "
+                                   "take the place of theirs");
+    }
+}
+
+void Dispatcher::stop() {
+    timers_.stop();
+    gate_.stop();
+    workers_.stop();
+}
+
+void Dispatcher::work(const SharedExchange& exchange, const Caller& caller) {
+    if (exchange->isFinished()) {
+        // Its time was over before a worker came: the client has been told that
+        // nothing was done.
+        return;
+    }
+    try {
+        const Call call = readCall(exchange->body, settings_.limits.depth);
+        checkAgreement(*exchange->headers, call);
+        Caller asking = caller;
+        asking.gone = [&exchange] { return exchange->isFinished(); };
+        exchange->finish(HttpAnswer::of(operations_.perform(call, asking)));
+    } catch (const HttpFailure& failure) {
+        log_(LogKind::request, exchange->address() + ": " + failure.what());
+        exchange->finish(HttpAnswer::failure(failure));
+    } catch (const NotValid& error) {
+        log_(LogKind::request, exchange->address() + ": " + error.what());
+        exchange->finish(HttpAnswer::failure(badRequest, "request-not-valid"));
+    } catch (const std::exception& error) {
+        log_(LogKind::failure, error.what());
+        exchange->finish(HttpAnswer::failure(serverFault));
+    }
+}
+
+}  // namespace cimom::wbem

@@ -1,0 +1,52 @@
+#pragma once
+
+#include <optional>
+#include <string>
+
+#include "http/Authenticator.h"
+#include "http/Exchange.h"
+#include "http/TaskPool.h"
+#include "operations/Operations.h"
+#include "wbem/Server.h"
+
+namespace cimom::wbem {
+
+/// What happens to requests that have arrived: their users are admitted or refused,
+/// their operations are carried out, and each gets its answer. Safe for concurrent
+/// use.
+class Dispatcher {
+  public:
+    /// Borrows all three.
+    Dispatcher(ObjectManager& manager, const ServerSettings& settings, const ServerLog& log);
+
+    /// Sees to the answer of a request that is complete and handed over.
+    void dispatch(const SharedExchange& exchange);
+    /// Answers, after a while, that credentials are needed, and logs who had none.
+    void refuse(const SharedExchange& exchange, const std::string& who);
+
+    /// Runs a short task once the delay is over.
+    void runAfter(TaskPool::Clock::duration delay, TaskPool::Task task);
+    /// Forgets enumerations that were silent for too long, and replaces workers
+    /// whose operation does not return.
+    void endOverdue();
+    /// Begins nothing more.
+    void stop();
+
+  private:
+    void admit(const SharedExchange& exchange, const Identity& identity);
+    void checkPassword(const SharedExchange& exchange);
+    void runOrRefuse(TaskPool& pool, const SharedExchange& exchange, TaskPool::Task task);
+    /// Carries a request out, in a worker.
+    void work(const SharedExchange& exchange, const Caller& caller);
+
+    const ServerSettings& settings_;
+    const ServerLog& log_;
+    Operations operations_;
+    std::optional<Authenticator> authenticator_;
+    // End first, in this order reversed: their tasks use all of the above.
+    TaskPool workers_;
+    TaskPool gate_;
+    TaskPool timers_;
+};
+
+}  // namespace cimom::wbem

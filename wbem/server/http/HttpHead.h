@@ -1,0 +1,45 @@
+#pragma once
+
+#include <cstddef>
+#include <optional>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "cimxml/Call.h"
+#include "wbem/Limits.h"
+
+namespace cimom::wbem {
+
+/// The part of an HTTP request before its body, as it arrived.
+struct HttpHead {
+    std::string method;
+    std::string target;   ///< the path, still with a query if there was one
+    std::string version;  ///< "HTTP/1.1"
+    std::vector<std::pair<std::string, std::string>> headers;
+
+    /// The values of all headers of that name, in their order.
+    [[nodiscard]] std::vector<std::string> values(std::string_view name) const;
+};
+
+/// What the headers say about the CIM operation (DSP0200, 7.2).
+struct CimHeaders {
+    bool manPost = false;  ///< by M-POST, which wants another form of answer
+    std::string method;    ///< decoded
+    std::string object;    ///< decoded
+    std::optional<std::string> protocolVersion;
+    std::optional<std::string> authorization;
+    std::optional<std::size_t> contentLength;  ///< none: chunked
+
+    bool operator==(const CimHeaders&) const = default;
+};
+
+/// Reads the head of a request. Throws HttpFailure for anything that is no
+/// CIM-XML request to this server, is ambiguous about its length, or is too long.
+[[nodiscard]] CimHeaders readHead(const HttpHead& head, const Limits& limits);
+
+/// Throws HttpFailure when the headers name another operation or target than the
+/// body does (DSP0200, 7.2).
+void checkAgreement(const CimHeaders& headers, const Call& call);
+
+}  // namespace cimom::wbem

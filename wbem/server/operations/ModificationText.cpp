@@ -1,0 +1,74 @@
+#include "operations/ModificationText.h"
+
+#include "cimom/ObjectPathText.h"
+#include "cimxml/Errors.h"
+#include "cimxml/ScalarText.h"
+
+namespace cimom::wbem {
+
+namespace {
+
+constexpr std::size_t longest = 200;
+
+std::string scalarText(Type type, const Scalar& scalar) {
+    if (std::holds_alternative<std::monostate>(scalar)) {
+        return "null";
+    }
+    if (const auto* const text = std::get_if<std::string>(&scalar)) {
+        std::string quoted = "\"";
+        for (const char letter : *text) {
+            if (letter == '"' || letter == '\\') {
+                quoted += '\\';
+            }
+            quoted += letter;
+        }
+        return quoted + '"';
+    }
+    if (const auto* const path = std::get_if<std::shared_ptr<const ObjectPath>>(&scalar)) {
+        return toText(**path);
+    }
+    std::string text;
+    appendScalarText(text, type, scalar);
+    return text.empty() ? "an instance" : text;
+}
+
+std::string valueText(const Value& value) {
+    std::string text;
+    if (value.isNull()) {
+        return "null";
+    }
+    if (const Array* const elements = value.array()) {
+        for (const Scalar& element : *elements) {
+            text += (text.empty() ? "{" : ", ") + scalarText(value.type, element);
+        }
+        text = text.empty() ? "{}" : text + '}';
+    } else {
+        text = scalarText(value.type, *value.scalar());
+    }
+    if (text.size() > longest) {
+        text = text.substr(0, longest) + "...";
+    }
+    return text;
+}
+
+}  // namespace
+
+std::string modificationText(const Modification& modification) {
+    std::string text = "modify user=";
+    text += modification.caller.user ? '"' + *modification.caller.user + '"' : "none";
+    text += " address=" + modification.caller.address + " object=" + toText(modification.object);
+    for (const Modification::Change& change : modification.changes) {
+        // Many clients send the whole instance back.
+        if (change.oldValue == change.newValue) {
+            continue;
+        }
+        text += ' ' + change.property + ": " +
+                (change.oldValue ? valueText(*change.oldValue) : "unknown") + " -> " +
+                valueText(change.newValue);
+    }
+    text += " status=";
+    text += modification.status == 0 ? "OK" : cimStatusName(modification.status);
+    return modification.description.empty() ? text : text + " (" + modification.description + ')';
+}
+
+}  // namespace cimom::wbem

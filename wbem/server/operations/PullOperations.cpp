@@ -1,0 +1,284 @@
+// The pull operations (DSP0200, 5.4.2): a result is opened, and fetched in portions.
+#include <algorithm>
+#include <optional>
+#include <utility>
+
+#include "cimxml/ObjectWriter.h"
+#include "cimxml/XmlText.h"
+#include "operations/PulledRecords.h"
+#include "operations/Request.h"
+
+namespace cimom::wbem {
+
+namespace {
+
+using Session = EnumerationSession;
+
+/// More objects come in no portion, whatever a client asks for.
+constexpr std::uint32_t largestPortion = 100'000;
+
+/// The parameters that all Open operations have.
+struct Opening {
+    std::chrono::seconds timeout{0};
+    std::uint32_t portion = 0;
+};
+
+Opening readOpening(Request& request) {
+    Parameters& parameters = request.parameters;
+    const auto language = parameters.text("FilterQueryLanguage");
+    const auto query = parameters.text("FilterQuery");
+    const bool continueOnError = parameters.flag("ContinueOnError", false);
+    const auto timeout = parameters.number("OperationTimeout");
+    const std::uint32_t portion = parameters.number("MaxObjectCount").value_or(0);
+    parameters.finish();
+    if (language || query) {
+        throw CimError(CimStatus::filteredEnumerationNotSupported, "");
+    }
+    if (continueOnError) {
+        throw CimError(CimStatus::continuationOnErrorNotSupported, "");
+    }
+    return {request.sessions.timeoutFor(timeout), std::min(portion, largestPortion)};
+}
+
+/// Objects that one answer brings.
+struct Portion {
+    RecordReader reader;
+    std::string context;  ///< to go on with; empty: these were the last
+};
+
+/// The next objects of a session, at most `count`.
+Portion takePortion(Session& session, std::size_t count, const std::string& context) {
+    RecordReader rest(session.records, session.position, session.records->size());
+    if (count >= session.left) {
+        session.left = 0;
+        return {std::move(rest), ""};
+    }
+    RecordReader behind = rest;
+    behind.skip(count);
+    const std::size_t begin = session.position;
+    session.position = behind.position();
+    session.left -= count;
+    return {RecordReader(session.records, begin, session.position), context};
+}
+
+std::string sequenceState(const std::string& context) {
+    std::string text = R"(<PARAMVALUE NAME="EnumerationContext" PARAMTYPE="string"><VALUE>)";
+    appendText(text, context);
+    text += R"(</VALUE></PARAMVALUE><PARAMVALUE NAME="EndOfSequence" PARAMTYPE="boolean"><VALUE>)";
+    text += context.empty() ? "TRUE" : "FALSE";
+    return text + "</VALUE></PARAMVALUE>";
+}
+
+enum class Form { path, instance, instanceWithPath };
+
+Answer portionAnswer(Request& request, Portion portion, Form form) {
+    return {answerHead(request.call) + "<IRETURNVALUE>",
+            [reader = std::move(portion.reader), form](std::string& out) mutable {
+                const auto record = reader.next();
+                if (!record) {
+                    return false;
+                }
+                const bool both = form == Form::instanceWithPath;
+                out += both ? "<VALUE.INSTANCEWITHPATH>" : "";
+                out += form == Form::instance ? "" : record->path;
+                out += record->object;
+                out += both ? "</VALUE.INSTANCEWITHPATH>" : "";
+                return true;
+            },
+            "</IRETURNVALUE>" + sequenceState(portion.context) + answerTail(request.call)};
+}
+
+/// Answers the first portion, and keeps what is left.
+Answer begin(Request& request, const Opening& opening, Session::Kind kind,
+             const SpooledResult& result) {
+    Session session{kind, result.spool, 0, result.count, opening.timeout, request.caller.user};
+    Portion portion = takePortion(session, opening.portion, "");
+    if (session.left > 0) {
+        portion.context = request.sessions.open(std::move(session));
+    }
+    return portionAnswer(request, std::move(portion),
+                         kind == Session::Kind::paths ? Form::path : Form::instanceWithPath);
+}
+
+template <typename Ask>
+Answer openPaths(Request& request, const Opening& opening, Ask&& ask) {
+    return begin(request, opening, Session::Kind::paths,
+                 spooled<ObjectPath>(
+                     request,
+                     [&host = request.manager.host(), text = std::string()](
+                         std::string& out, const ObjectPath& path) mutable {
+                         text.clear();
+                         writeInstancePath(text, path, host);
+                         appendRecord(out, text, "");
+                     },
+                     std::forward<Ask>(ask)));
+}
+
+/// `cut`: the class to whose properties the instances are cut; null: all are shown.
+template <typename Ask>
+Answer openInstances(Request& request, const Opening& opening, bool classOrigin,
+                     const ClassDeclaration* cut, Ask&& ask) {
+    const ClassRepository* const origins = classOrigin ? &request.manager.repository() : nullptr;
+    return begin(request, opening, Session::Kind::instances,
+                 spooled<Instance>(
+                     request,
+                     [&host = request.manager.host(), origins, cut, path = std::string(),
+                      text = std::string()](std::string& out, Instance& instance) mutable {
+                         cutToClass(instance, cut);
+                         path.clear();
+                         text.clear();
+                         writeInstancePath(path, instance.path, host);
+                         writeInstanceOf(text, instance, origins);
+                         appendRecord(out, path, text);
+                     },
+                     std::forward<Ask>(ask)));
+}
+
+Answer openEnumerateInstances(Request& request) {
+    const std::string className = request.parameters.requiredClassName("ClassName");
+    const bool deep = request.parameters.flag("DeepInheritance", true);
+    const bool classOrigin = request.parameters.flag("IncludeClassOrigin", false);
+    const InstanceRequest reading{request.parameters.texts("PropertyList"),
+                                  request.caller.user.value_or("")};
+    const Opening opening = readOpening(request);
+    const ClassDeclaration* const cut =
+        deep ? nullptr : request.manager.repository().find(className);
+    return openInstances(request, opening, classOrigin, cut, [&](auto& receiver) {
+        return request.manager.enumerateInstances(classPath(request, className), reading, receiver);
+    });
+}
+
+Answer openEnumerateInstancePaths(Request& request) {
+    const std::string className = request.parameters.requiredClassName("ClassName");
+    const Opening opening = readOpening(request);
+    const InstanceRequest reading{std::nullopt, request.caller.user.value_or("")};
+    return openPaths(request, opening, [&](auto& receiver) {
+        return request.manager.enumerateInstanceNames(classPath(request, className), reading,
+                                                      receiver);
+    });
+}
+
+/// The parameters of the Open operations about associations; there the source is
+/// always an instance.
+struct Source {
+    ObjectPath path;
+    AssociationRequest filter;
+    bool classOrigin = false;
+};
+
+Source readSource(Request& request, bool associators, bool instances) {
+    Parameters& parameters = request.parameters;
+    Source source;
+    source.path = located(request, parameters.requiredInstanceName("InstanceName"));
+    source.filter.resultClass = parameters.className("ResultClass");
+    source.filter.role = parameters.text("Role");
+    if (associators) {
+        source.filter.assocClass = parameters.className("AssocClass");
+        source.filter.resultRole = parameters.text("ResultRole");
+    }
+    if (instances) {
+        source.classOrigin = parameters.flag("IncludeClassOrigin", false);
+        source.filter.propertyList = parameters.texts("PropertyList");
+    }
+    source.filter.principal = request.caller.user.value_or("");
+    return source;
+}
+
+Answer openAssociated(Request& request, bool associators) {
+    const Source source = readSource(request, associators, true);
+    const Opening opening = readOpening(request);
+    return openInstances(request, opening, source.classOrigin, nullptr, [&](auto& receiver) {
+        return associators ? request.manager.associators(source.path, source.filter, receiver)
+                           : request.manager.references(source.path, source.filter, receiver);
+    });
+}
+
+Answer openAssociatedPaths(Request& request, bool associators) {
+    const Source source = readSource(request, associators, false);
+    const Opening opening = readOpening(request);
+    return openPaths(request, opening, [&](auto& receiver) {
+        return associators ? request.manager.associatorNames(source.path, source.filter, receiver)
+                           : request.manager.referenceNames(source.path, source.filter, receiver);
+    });
+}
+
+/// What a Pull operation asks for.
+struct Pulling {
+    std::string context;
+    std::size_t portion = 0;
+};
+
+Pulling readPulling(Request& request) {
+    Pulling pulling;
+    pulling.context = request.parameters.requiredText("EnumerationContext");
+    pulling.portion = std::min(request.parameters.requiredNumber("MaxObjectCount"), largestPortion);
+    request.parameters.finish();
+    return pulling;
+}
+
+/// Answers with the next portion of a session with such objects.
+Answer pull(Request& request, Session::Kind kind, Form form) {
+    const Pulling pulling = readPulling(request);
+    std::optional<Portion> portion;
+    request.sessions.use(pulling.context, request.caller.user, [&](Session& session) {
+        if (session.kind != kind) {
+            throw CimError(CimStatus::invalidEnumerationContext,
+                           "this enumeration was opened for another kind of pull");
+        }
+        portion = takePortion(session, pulling.portion, pulling.context);
+    });
+    return portionAnswer(request, *std::move(portion), form);
+}
+
+Answer pullInstancesWithPath(Request& request) {
+    return pull(request, Session::Kind::instances, Form::instanceWithPath);
+}
+
+Answer pullInstancePaths(Request& request) {
+    return pull(request, Session::Kind::paths, Form::path);
+}
+
+/// DSP0200 has this for queries, which are not served; a client that does not need
+/// the paths may use it for any instances.
+Answer pullInstances(Request& request) {
+    return pull(request, Session::Kind::instances, Form::instance);
+}
+
+Answer closeEnumeration(Request& request) {
+    const std::string context = request.parameters.requiredText("EnumerationContext");
+    request.parameters.finish();
+    request.sessions.close(context, request.caller.user);
+    return plainAnswer(request.call, "");
+}
+
+Answer enumerationCount(Request& request) {
+    const std::string context = request.parameters.requiredText("EnumerationContext");
+    request.parameters.finish();
+    std::size_t count = 0;
+    request.sessions.use(context, request.caller.user,
+                         [&count](const Session& session) { count = session.left; });
+    return plainAnswer(request.call,
+                       "<IRETURNVALUE><VALUE>" + std::to_string(count) + "</VALUE></IRETURNVALUE>");
+}
+
+}  // namespace
+
+std::vector<NamedOperation> pullOperations() {
+    return {
+        {"OpenEnumerateInstances", openEnumerateInstances},
+        {"OpenEnumerateInstancePaths", openEnumerateInstancePaths},
+        {"OpenAssociatorInstances", [](Request& request) { return openAssociated(request, true); }},
+        {"OpenAssociatorInstancePaths",
+         [](Request& request) { return openAssociatedPaths(request, true); }},
+        {"OpenReferenceInstances", [](Request& request) { return openAssociated(request, false); }},
+        {"OpenReferenceInstancePaths",
+         [](Request& request) { return openAssociatedPaths(request, false); }},
+        {"PullInstancesWithPath", pullInstancesWithPath},
+        {"PullInstancePaths", pullInstancePaths},
+        {"PullInstances", pullInstances},
+        {"CloseEnumeration", closeEnumeration},
+        {"EnumerationCount", enumerationCount},
+    };
+}
+
+}  // namespace cimom::wbem

@@ -1,0 +1,138 @@
+#include "operations/Request.h"
+
+#include <algorithm>
+
+#include "cimxml/ObjectWriter.h"
+#include "cimxml/PathLocation.h"
+
+namespace cimom::wbem {
+
+namespace {
+
+void nameBareKey(NamedValue& key, const ClassDeclaration* declaration) {
+    const PropertyDeclaration* only = nullptr;
+    int count = 0;
+    if (declaration != nullptr) {
+        for (const PropertyDeclaration& property : declaration->properties) {
+            if (property.isKey()) {
+                only = &property;
+                ++count;
+            }
+        }
+    }
+    if (count != 1) {
+        throw CimError(CimStatus::invalidParameter,
+                       "a key without a name is for classes with one key only");
+    }
+    key.name = only->name;
+}
+
+}  // namespace
+
+void requireNameSpace(const Request& request) {
+    const auto& known = request.manager.nameSpaces();
+    if (std::none_of(known.begin(), known.end(), [&request](const std::string& one) {
+            return sameName(one, request.call.nameSpace);
+        })) {
+        throw CimError(CimStatus::invalidNamespace,
+                       "no namespace \"" + request.call.nameSpace + "\"");
+    }
+}
+
+const ClassDeclaration& requireClass(const Request& request, const std::string& className,
+                                     CimStatus unknown) {
+    requireNameSpace(request);
+    const ClassDeclaration* const declaration = request.manager.repository().find(className);
+    if (declaration == nullptr) {
+        throw CimError(unknown, "no class \"" + className + "\"");
+    }
+    return *declaration;
+}
+
+ObjectPath located(const Request& request, ObjectPath path) {
+    locate(path, request.call.nameSpace);
+    for (NamedValue& key : path.keys) {
+        if (key.name.empty()) {
+            nameBareKey(key, request.manager.repository().find(path.className));
+        }
+    }
+    return path;
+}
+
+ObjectPath classPath(const Request& request, const std::string& className) {
+    return {"", request.call.nameSpace, className, {}};
+}
+
+unsigned cimCode(const Status& status) noexcept {
+    const auto code = static_cast<unsigned>(status.code);
+    const bool shared = code <= static_cast<unsigned>(CMPI_RC_ERR_METHOD_NOT_FOUND);
+    return shared ? code : static_cast<unsigned>(CimStatus::failed);
+}
+
+void requireOk(const Status& status) {
+    if (!status.ok()) {
+        throw CimError(cimCode(status), status.message);
+    }
+}
+
+void cutToClass(Instance& instance, const ClassDeclaration* declaration) {
+    if (declaration != nullptr) {
+        std::erase_if(instance.properties, [declaration](const NamedValue& property) {
+            return declaration->property(property.name) == nullptr;
+        });
+    }
+}
+
+template <typename Object>
+void SpoolReceiver<Object>::take(std::optional<Object> object) {
+    if (caller_.gone && caller_.gone()) {
+        throw CimError(CimStatus::failed, "nobody waits for the result any more");
+    }
+    if (object) {
+        text_.clear();
+        write_(text_, *object);
+        result_.spool->append(text_);
+        ++result_.count;
+    }
+}
+
+template <typename Object>
+std::size_t SpoolReceiver<Object>::mark() {
+    marks_.push_back({result_.spool->size(), result_.count});
+    return marks_.size() - 1;
+}
+
+template <typename Object>
+void SpoolReceiver<Object>::backTo(std::size_t mark) {
+    result_.spool->cut(marks_[mark].size);
+    result_.count = marks_[mark].count;
+}
+
+template class SpoolReceiver<ObjectPath>;
+template class SpoolReceiver<Instance>;
+
+void writeInstanceOf(std::string& out, const Instance& instance,
+                     const ClassRepository* originRepository) {
+    writeInstance(
+        out, instance,
+        originRepository == nullptr ? nullptr : originRepository->find(instance.path.className));
+}
+
+Answer spoolAnswer(const Call& call, const SpooledResult& result) {
+    return {answerHead(call) + "<IRETURNVALUE>",
+            [spool = std::shared_ptr<const Spool>(result.spool),
+             position = std::size_t{0}](std::string& out) mutable {
+                constexpr std::size_t piece = 32768;
+                const std::size_t size = std::min(piece, spool->size() - position);
+                spool->read(position, size, out);
+                position += size;
+                return size > 0;
+            },
+            "</IRETURNVALUE>" + answerTail(call)};
+}
+
+Answer plainAnswer(const Call& call, const std::string& content) {
+    return Answer(answerHead(call) + content + answerTail(call));
+}
+
+}  // namespace cimom::wbem
