@@ -27,7 +27,8 @@ void checkKernel(std::string_view text) {
                   "a server is an address");
     const std::string again = std::string("#PROTO: ") + (answer->bootp ? "BOOTP" : "DHCP") +
                               "\nbootserver " + answer->server + '\n';
-    fuzz::require(ZR::Live::parseKernelBoot(again) == answer, "an answer survives being written");
+    fuzz::require(ZR::Live::parseKernelBoot(again) == answer,
+                  "what the kernel was told survives being written");
 }
 
 }  // namespace

@@ -1,5 +1,5 @@
-// The answers of a service processor: in pieces of a byte that tells which question is
-// answered and how, a byte of the answer's length, and the answer.
+// The responses of a service processor: in pieces of a byte that tells to which request
+// it belongs and how it ends, a byte of the response's length, and the response.
 #include <arpa/inet.h>
 
 #include <cerrno>
@@ -23,7 +23,7 @@ class Processor final : public ZR::Live::IpmiTransport {
     void close() noexcept override {}
 
     int send(long id, const ZR::Live::IpmiRequest& request) override {
-        fuzz::require(id > lastId_, "each question has a number of its own");
+        fuzz::require(id > lastId_, "each request has a number of its own");
         lastId_ = id;
         last_ = request;
         ++asked;
@@ -40,9 +40,9 @@ class Processor final : public ZR::Live::IpmiTransport {
             return {.error = (head & 1U) != 0 ? EAGAIN : EIO, .answer = {}};
         }
         const auto answer = input_.take(input_.number<std::uint8_t>());
-        // The numbers of the questions go up, and the last ones are those that are open.
+        // The numbers of the requests go up, and the last ones are those that are open.
         const long id = lastId_ - static_cast<long>(head & 0x0FU);
-        // Most questions are of the network function 0x0C; that of the channel is 0x06.
+        // Most requests are of the network function 0x0C; that of the channel is 0x06.
         const bool channel = (head & 0x40U) != 0;
         return {.error = 0,
                 .id = id,
@@ -99,17 +99,17 @@ void checkConversation(const std::uint8_t* data, std::size_t size) {
     auto now = ZR::Live::IpmiConversation::Time{};
     ZR::Live::IpmiConversation conversation(processor, lastId,
                                             ZR::Live::IpmiConversation::usualChannel, now);
-    // Eleven at which an answer is missed are more than a second; those at which the
-    // answers of one of the three rounds have come do not count.
+    // Eleven at which a response is missed are more than a second; those at which the
+    // responses of one of the three rounds have come do not count.
     constexpr int looks = 11 + 3;
     for (int i = 0; i < looks && conversation.state() == State::Underway; ++i) {
         const int before = processor.received;
         now += std::chrono::milliseconds(100);
         static_cast<void>(conversation.continue_(now));
-        fuzz::require(processor.received - before <= 64, "nobody's flood keeps a caller");
+        fuzz::require(processor.received - before <= 64, "no flood keeps a caller");
     }
-    constexpr int mostQuestions = 16;
-    fuzz::require(processor.asked <= mostQuestions, "questions are few");
+    constexpr int mostRequests = 16;
+    fuzz::require(processor.asked <= mostRequests, "requests are few");
     fuzz::require(conversation.state() != State::Underway, "a conversation ends in time");
     if (conversation.state() == State::Failed) {
         fuzz::require(conversation.complaints().size() == 1, "a failure has a reason");

@@ -73,7 +73,7 @@ int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
                       settings.traceLevel == expectedLevel(lines, variables, "TRACE_LEVEL"),
                   "the last level that is one counts, else the default");
     fuzz::require(settings.complaints.size() <= lines.size() + variables.size(),
-                  "each line and variable is complained about once at most");
+                  "each line and variable has one diagnostic at most");
     fuzz::require(ZR::PlatformSettings::read(environment) == settings,
                   "reading again gives the same");
     return 0;
