@@ -185,7 +185,8 @@ using ReferenceColumn = CMPIrc (*AssociationClass::*)(const Request&);
 template <typename Adapter>
 constexpr AssociationClass association(unsigned short id) {
     return {id, &deliverAssociatorNames<Adapter>, &deliverAssociators<Adapter>,
-            &deliverPaths<Adapter, Ending::left>, &deliverInstances<Adapter, Ending::left>};
+            &deliverPaths<Adapter, Ending::returnDone>,
+            &deliverInstances<Adapter, Ending::returnDone>};
 }
 
 constexpr std::array associationClasses{
@@ -271,7 +272,6 @@ CMPIStatus serveReferences(const Request& request, const char* resultClass, Refe
     if (const AssociationClass* association = findAssociation(classId)) {
         try {
             status.rc = (association->*column)(request);
-            request.result->ft->returnDone(request.result);
         } catch (const std::exception& exception) {
             // The names handler is the silent one.
             if (!names) {
