@@ -185,7 +185,8 @@ using ReferenceColumn = CMPIrc (*AssociationClass::*)(const Request&);
 template <typename Adapter>
 constexpr AssociationClass association(unsigned short id) {
     return {id, &deliverAssociatorNames<Adapter>, &deliverAssociators<Adapter>,
-            &deliverPaths<Adapter, Ending::left>, &deliverInstances<Adapter, Ending::left>};
+            &deliverPaths<Adapter, Ending::returnDone>,
+            &deliverInstances<Adapter, Ending::returnDone>};
 }
 
 constexpr std::array associationClasses{
@@ -271,7 +272,6 @@ CMPIStatus serveReferences(const Request& request, const char* resultClass, Refe
     if (const AssociationClass* association = findAssociation(classId)) {
         try {
             status.rc = (association->*column)(request);
-            request.result->ft->returnDone(request.result);
         } catch (const std::exception& exception) {
             // The names handler is the silent one.
             if (!names) {
@@ -343,6 +343,8 @@ constexpr std::array<ParentClass, 6> parentClasses{{
 
 bool getClassId(const char* className, const char* nameSpace,
                 std::vector<unsigned short>& classIds) {
+    const ParameterScope scope(ZR_HERE, " className=", className, " nameSpace=", nameSpace,
+                               " classIds=", &classIds);
     const unsigned short classId = ProviderUtilities::getClassId(className);
     if (classId != ProviderUtilities::unknownClass) {
         classIds.push_back(classId);
@@ -394,9 +396,15 @@ const CMPIAssociationMIFT assocMIFT__{
 
 }  // namespace ZR::DHCPClientProvider
 
+namespace {
+
+using ZR::DHCPClientProvider::source;
+
+}  // namespace
+
 CMPIInstanceMI* DHCPClientProvider_Create_InstanceMI(const CMPIBroker* broker,
-                                                     const CMPIContext* /*ctx*/,
-                                                     CMPIStatus* /*rc*/) {
+                                                     const CMPIContext* ctx, CMPIStatus* rc) {
+    const ZR::ParameterScope scope(ZR_HERE, " broker=", broker, " ctx=", ctx, " rc=", rc);
     static CMPIInstanceMI mi{nullptr, &ZR::DHCPClientProvider::instMIFT__};
     ZR::DHCPClientProvider::broker = broker;
     ZR::serveLiveMachine();
@@ -404,8 +412,8 @@ CMPIInstanceMI* DHCPClientProvider_Create_InstanceMI(const CMPIBroker* broker,
 }
 
 CMPIAssociationMI* DHCPClientProvider_Create_AssociationMI(const CMPIBroker* broker,
-                                                           const CMPIContext* /*ctx*/,
-                                                           CMPIStatus* /*rc*/) {
+                                                           const CMPIContext* ctx, CMPIStatus* rc) {
+    const ZR::ParameterScope scope(ZR_HERE, " broker=", broker, " ctx=", ctx, " rc=", rc);
     static CMPIAssociationMI mi{nullptr, &ZR::DHCPClientProvider::assocMIFT__};
     ZR::DHCPClientProvider::broker = broker;
     ZR::serveLiveMachine();

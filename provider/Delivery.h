@@ -37,30 +37,37 @@ void deliver(const Request& request, Object* object,
     static_cast<void>(give(request.result, object));
 }
 
-template <typename Adapter, Ending ending>
-CMPIrc deliverPaths(const Request& request) {
-    for (Adapter adapter(broker, request.context, request.path); adapter; ++adapter) {
-        deliver(request, adapter.getObjectPath(), request.result->ft->returnObjectPath);
+/// Walks a whole adapter. It still exists when the result is told that it is complete.
+template <typename Adapter, Ending ending, typename Give>
+CMPIrc walk(const Request& request, const Give& give) {
+    Adapter adapter(broker, request.context, request.path);
+    for (; adapter; ++adapter) {
+        give(adapter);
     }
     if constexpr (ending == Ending::returnDone) {
         request.result->ft->returnDone(request.result);
     }
     return CMPI_RC_OK;
+}
+
+template <typename Adapter, Ending ending>
+CMPIrc deliverPaths(const Request& request) {
+    return walk<Adapter, ending>(request, [&request](Adapter& adapter) {
+        deliver(request, adapter.getObjectPath(), request.result->ft->returnObjectPath);
+    });
 }
 
 template <typename Adapter, Ending ending>
 CMPIrc deliverInstances(const Request& request) {
-    for (Adapter adapter(broker, request.context, request.path); adapter; ++adapter) {
+    return walk<Adapter, ending>(request, [&request](Adapter& adapter) {
         deliver(request, adapter.getCMPIInstance(request.properties),
                 request.result->ft->returnInstance);
-    }
-    if constexpr (ending == Ending::returnDone) {
-        request.result->ft->returnDone(request.result);
-    }
-    return CMPI_RC_OK;
+    });
 }
 
 /// Walks the far ends, unless the client wants another class than the adapter has there.
+/// The adapter is gone before the next association is served; the result is told that it
+/// is complete after the last one.
 template <typename Adapter, typename Give>
 void walkFarEnds(const Request& request, const char* resultClass, const Give& give) {
     Adapter adapter(broker, request.context, request.path);

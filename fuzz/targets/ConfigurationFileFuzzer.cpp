@@ -1,6 +1,7 @@
 // Key, value and content of an interface's configuration file, with zero bytes
 // between. What becomes of the file is told by a model that goes byte by byte.
 #include "Lindows/ConfigurationFile.h"
+#include "Lindows/DHCPSettingData.h"
 
 #include "Input.h"
 #include "support/FuzzMachine.h"

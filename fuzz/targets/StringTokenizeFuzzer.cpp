@@ -1,5 +1,5 @@
 // A list of delimiters, a zero byte, and the text to take apart by them.
-#include "include/StringTokenize.h"
+#include "Lindows/DHCPSettingData.h"
 
 #include "Input.h"
 

@@ -5,20 +5,23 @@ namespace ZR::DHCPClientProvider {
 using NodeLexicon::NodeType;
 using NodeLexicon::Properties;
 
-std::optional<std::string> findKey(Moniker& moniker, const char* name, Occurrence occurrence,
-                                   const TracePoint& at) {
+std::optional<std::string> findKey(Moniker& moniker, std::string_view name, const TracePoint& at) {
     std::optional<std::string> found;
-    visitKeys(moniker, name, [&](std::size_t, std::string&& value) {
+    visitKeys(moniker, [&](std::size_t, const std::string& present) {
+        std::string value;
+        if (present != name || !moniker.getValue(value)) {
+            return false;
+        }
         traceVariable(at, name, value);
         found = std::move(value);
-        return occurrence == Occurrence::first;
+        return true;
     });
     return found;
 }
 
-std::string requireKey(Moniker& moniker, const char* name, const char* message,
+std::string requireKey(Moniker& moniker, std::string_view name, const char* message,
                        const TracePoint& at) {
-    std::optional<std::string> value = findKey(moniker, name, Occurrence::first, at);
+    std::optional<std::string> value = findKey(moniker, name, at);
     if (!value) {
         throw FrameworkException(message);
     }

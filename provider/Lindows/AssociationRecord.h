@@ -1,7 +1,10 @@
 #pragma once
 
+#include <algorithm>
+#include <array>
 #include <optional>
 #include <string>
+#include <string_view>
 #include <utility>
 
 #include "include/Exceptions.h"
@@ -19,31 +22,46 @@
 /// Builders move the record's cursor: one record is used by one request.
 namespace ZR::DHCPClientProvider {
 
-/// Shows every key of that name to `visit(position, value)`, until it answers true.
-/// Names compare exactly.
+/// Shows every key to `visit(position, name)`, in the moniker's order, until that answers
+/// true. The moniker stands on the key shown, so that its value can be read.
 template <typename Visit>
-void visitKeys(Moniker& moniker, const char* name, const Visit& visit) {
+void visitKeys(Moniker& moniker, const Visit& visit) {
     const std::size_t count = moniker.getKeyCount();
     for (std::size_t position = 0; position < count; ++position) {
-        std::string keyName;
-        std::string value;
-        if (moniker.selectKey(position) && moniker.getName(keyName) && keyName == name &&
-            moniker.getValue(value) && visit(position, std::move(value))) {
+        std::string name;
+        if (moniker.selectKey(position) && moniker.getName(name) && visit(position, name)) {
             return;
         }
     }
 }
 
-/// Which of several keys of one name counts.
-enum class Occurrence { first, last };
+// Names of keys compare exactly. The value of each key that is read is traced under the
+// key's name.
 
-/// The value of a key. Each that is read is traced under the key's name.
-std::optional<std::string> findKey(Moniker& moniker, const char* name, Occurrence occurrence,
-                                   const TracePoint& at);
+/// The value of the first key of that name.
+std::optional<std::string> findKey(Moniker& moniker, std::string_view name, const TracePoint& at);
+
+/// The values of several keys, found in one walk over all keys. Of several keys of one
+/// name the last counts.
+template <std::size_t count>
+std::array<std::optional<std::string>, count> findKeys(
+    Moniker& moniker, const std::array<std::string_view, count>& names, const TracePoint& at) {
+    std::array<std::optional<std::string>, count> values;
+    visitKeys(moniker, [&](std::size_t, const std::string& name) {
+        std::string value;
+        const auto wanted = std::find(names.begin(), names.end(), name);
+        if (wanted != names.end() && moniker.getValue(value)) {
+            traceVariable(at, name, value);
+            values[static_cast<std::size_t>(wanted - names.begin())] = std::move(value);
+        }
+        return false;
+    });
+    return values;
+}
 
 /// The value of the first key of that name; throws FrameworkException with the
 /// message when there is none.
-std::string requireKey(Moniker& moniker, const char* name, const char* message,
+std::string requireKey(Moniker& moniker, std::string_view name, const char* message,
                        const TracePoint& at);
 
 /// A moniker with one key.

@@ -10,17 +10,12 @@
 #include <optional>
 #include <string_view>
 
-#include "include/TracePoint.h"
 #include "zrcommon/File.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace ZR::DHCPClientProvider {
 
-const std::string loggerConfigurationFile = loggerCategory;
-
 namespace {
-
-const TraceSource source{"Lindows/ConfigurationFile", loggerConfigurationFile};
 
 constexpr std::size_t pieceSize = 511;
 
@@ -31,7 +26,7 @@ std::string_view firstPiece(std::string_view text) {
     return lineFeed == std::string_view::npos ? piece : piece.substr(0, lineFeed + 1);
 }
 
-/// Whether the key occurs in a piece. What stands behind a zero byte is no text any more.
+/// Whether the key occurs in a piece. What stands behind a zero byte does not count.
 bool mentions(std::string_view piece, std::string_view key) {
     return piece.substr(0, piece.find('\0')).find(key) != std::string_view::npos;
 }
@@ -113,27 +108,22 @@ std::string configurationFilePath(const std::string& directory, const std::strin
     return directory + "ifcfg-" + interfaceName;
 }
 
-// The parameters are taken by value as the operation always has been.
-// NOLINTNEXTLINE(performance-unnecessary-value-param)
-void modifyValue(std::string path, std::string key, std::string value) {
-    const ParameterScope scope(ZR_HERE, " path=", path, " key=", key, " value=", value);
+std::optional<std::string> rewriteValue(const std::string& path, const std::string& key,
+                                        const std::string& value) {
     if (value.find_first_of(std::string_view("\n\r\0", 3)) != std::string::npos) {
-        traceMessage(ZR_HERE, "The value cannot be one line of the configuration file");
-        return;
+        return "The value cannot be one line of the configuration file";
     }
     const std::optional<std::string> content = File::read(path);
     if (!content) {
-        return;
+        return std::nullopt;
     }
     // A file that may be read but not written stays as it is, without a word. A pipe
     // that took its place since must not hang the caller.
     const UniqueFd fd{::open(path.c_str(), O_WRONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY)};
-    if (!fd) {
-        return;
+    if (!fd || replaceContent(fd.get(), *content, rewritten(*content, key, value))) {
+        return std::nullopt;
     }
-    if (!replaceContent(fd.get(), *content, rewritten(*content, key, value))) {
-        traceMessage(ZR_HERE, (path + ": " + std::strerror(errno)).c_str());
-    }
+    return path + ": " + std::strerror(errno);
 }
 
 }  // namespace ZR::DHCPClientProvider

@@ -1,11 +1,11 @@
 #pragma once
 
+#include <optional>
 #include <string>
 
-/// The configuration file of an interface: lines KEY=value, one setting each.
+/// The configuration file of an interface: lines KEY=value, one setting each. What is
+/// done to it is traced by the setting data whose name is in it.
 namespace ZR::DHCPClientProvider {
-
-extern const std::string loggerConfigurationFile;
 
 /// The path of an interface's file in a directory that ends with its separator.
 /// Empty for a name that would leave the directory or could not be a file name:
@@ -20,11 +20,14 @@ extern const std::string loggerConfigurationFile;
 ///
 /// The file is rewritten in place: it keeps its inode, owner and mode. Without a
 /// file nothing is done, and nothing is created. A value that cannot be one line
-/// (with a line feed, carriage return or zero byte) changes nothing; that, and a
-/// write that fails, is told in a failure line. When there is no room for the new
-/// content, the file keeps the old one.
+/// (with a line feed, carriage return or zero byte) changes nothing. When there is
+/// no room for the new content, the file keeps the old one.
 ///
-/// Callers that write the same file at once are not kept apart.
-void modifyValue(std::string path, std::string key, std::string value);
+/// Returns why the value could not be written, as a diagnostic; nothing when it was,
+/// or when there is no file that may be written. Callers that write the same file at
+/// once are not kept apart.
+[[nodiscard]] std::optional<std::string> rewriteValue(const std::string& path,
+                                                      const std::string& key,
+                                                      const std::string& value);
 
 }  // namespace ZR::DHCPClientProvider

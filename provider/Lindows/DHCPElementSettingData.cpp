@@ -3,7 +3,6 @@
 #include "Lindows/AssociationRecord.h"
 #include "Lindows/DHCPProtocolEndpoint.h"
 #include "Lindows/DHCPSettingData.h"
-#include "include/StringTokenize.h"
 
 namespace ZR::DHCPClientProvider {
 

@@ -2,7 +2,6 @@
 
 #include "Lindows/AssociationRecord.h"
 #include "Lindows/DHCPSettingData.h"
-#include "include/StringTokenize.h"
 
 namespace ZR::DHCPClientProvider {
 

@@ -51,12 +51,9 @@ Moniker DHCPRemoteAccessAvailableToElement::getDHCPProtocolEndpointMoniker(
     Moniker& accesspointmoniker) {
     const ParameterScope scope(ZR_HERE, " accesspointmoniker=", &accesspointmoniker);
     const TracePoint at = ZR_HERE;
-    const auto last = [&](const char* key) {
-        return findKey(accesspointmoniker, key, Occurrence::last, at);
-    };
-    const std::optional<std::string> name = last("Name");
-    const std::string systemClass = last("SystemCreationClassName").value_or("");
-    const std::string systemName = last("SystemName").value_or("");
+    constexpr std::array<std::string_view, 3> names{"Name", "SystemCreationClassName",
+                                                    "SystemName"};
+    const auto [name, systemClass, systemName] = findKeys(accesspointmoniker, names, at);
     if (!name) {
         throw FrameworkException(noNameKey);
     }
@@ -76,8 +73,8 @@ Moniker DHCPRemoteAccessAvailableToElement::getDHCPProtocolEndpointMoniker(
     }
     Moniker endpoint;
     endpoint.addKey("Name", nameKey);
-    endpoint.addKey("SystemName", systemName);
-    endpoint.addKey("SystemCreationClassName", systemClass);
+    endpoint.addKey("SystemName", systemName.value_or(""));
+    endpoint.addKey("SystemCreationClassName", systemClass.value_or(""));
     endpoint.addKey("CreationClassName", "QVXZR_DHCPProtocolEndpoint");
     return endpoint;
 }

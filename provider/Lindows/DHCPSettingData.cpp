@@ -131,4 +131,31 @@ bool DHCPSettingData::getRequestedOptions(unsigned short& value) const {
     return unsupported(ZR_HERE, &value);
 }
 
+// The parameters are taken by value as the operation always has been.
+// NOLINTNEXTLINE(performance-unnecessary-value-param)
+void modifyValue(std::string path, std::string key, std::string value) {
+    const ParameterScope scope(ZR_HERE, " path=", path, " key=", key, " value=", value);
+    if (const auto reason = rewriteValue(path, key, value)) {
+        traceMessage(ZR_HERE, reason->c_str());
+    }
+}
+
 }  // namespace ZR::DHCPClientProvider
+
+namespace ZR {
+
+using DHCPClientProvider::source;
+
+void stringTokenize(const std::string& text, std::vector<std::string>& tokens,
+                    const std::string& delimiters) {
+    const ParameterScope scope(ZR_HERE, " text=", text, " tokens=", &tokens,
+                               " delimiters=", delimiters);
+    std::size_t start = text.find_first_not_of(delimiters);
+    while (start != std::string::npos) {
+        const std::size_t end = text.find_first_of(delimiters, start);
+        tokens.push_back(text.substr(start, end - start));
+        start = text.find_first_not_of(delimiters, end);
+    }
+}
+
+}  // namespace ZR

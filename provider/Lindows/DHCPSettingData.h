@@ -5,6 +5,16 @@
 
 #include "zrclient/Instrumentation.h"
 
+namespace ZR {
+
+/// Splits a text at every character of `delimiters` and appends the pieces to
+/// `tokens`. Runs of delimiters count as one, and those at the ends do not count: a
+/// piece is never empty.
+void stringTokenize(const std::string& text, std::vector<std::string>& tokens,
+                    const std::string& delimiters);
+
+}  // namespace ZR
+
 namespace ZR::DHCPClientProvider {
 
 extern const std::string loggerDHCPSettingData;
@@ -61,5 +71,9 @@ class DHCPSettingData {
     std::vector<Filter> filters_;
     Instrumentation cursor_;
 };
+
+/// Gives a key of a configuration file a new value, as rewriteValue does. Why it could
+/// not is told in a failure line, and nowhere else.
+void modifyValue(std::string path, std::string key, std::string value);
 
 }  // namespace ZR::DHCPClientProvider

@@ -44,9 +44,11 @@ Moniker ElementCapabilities::getDHCPEndpointMoniker(Moniker& monikerCapabilities
     const auto count = static_cast<unsigned>(monikerCapabilities.getKeyCount());
     unsigned keyId = count;
     std::string instanceId;
-    visitKeys(monikerCapabilities, "InstanceID", [&](std::size_t position, std::string&& value) {
+    visitKeys(monikerCapabilities, [&](std::size_t position, const std::string& name) {
+        if (name != "InstanceID" || !monikerCapabilities.getValue(instanceId)) {
+            return false;
+        }
         keyId = static_cast<unsigned>(position);
-        instanceId = std::move(value);
         return true;
     });
     traceVariable(ZR_HERE, "InstanceID", instanceId);

@@ -17,8 +17,8 @@ struct Keys {
 };
 
 Keys readKeys(Moniker& moniker, const TracePoint& at) {
-    const auto name = findKey(moniker, "Name", Occurrence::last, at);
-    const auto systemName = findKey(moniker, "SystemName", Occurrence::last, at);
+    constexpr std::array<std::string_view, 2> names{"Name", "SystemName"};
+    const auto [name, systemName] = findKeys(moniker, names, at);
     if (!name && !systemName) {
         throw FrameworkException("Could not find 'Name' and 'System Name' Key in Moniker");
     }

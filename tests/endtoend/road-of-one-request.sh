@@ -1,5 +1,5 @@
 #!/usr/bin/env bash
-# The road of one EnumerateInstances request through the provider, as its log tells
+# What one EnumerateInstances request does in the provider, as its log tells
 # it, line for line. Times, line numbers, addresses and the host's name are what
 # differs from run to run; they are replaced by T, N, ADDRESS and HOST.
 #

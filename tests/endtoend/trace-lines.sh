@@ -1,6 +1,8 @@
 #!/usr/bin/env bash
-# Every line that the two providers write on any road, once, for requests of every kind
-# on a machine with one interface of each sort and a service processor.
+# The lines that the two providers write, in their order, for requests of every kind on
+# a machine with one interface of each sort and a service processor. A line is left out
+# where the same two lines followed each other before: each step from one line to the
+# next is told once, at the first request that takes it.
 #
 # Usage: trace-lines.sh PATH-OF-cimdhcp EXPECTED
 #        UPDATE_EXPECTED=yes trace-lines.sh ...   takes today's lines as the right ones
@@ -38,9 +40,17 @@ mkdir "$work/data"
 printf 'CONFIG_NAME=office\n' >"$work/data/ifcfg-eth0"
 
 ask() {
+    printf '== %s\n' "$*" | tee -a "$work/log" >>"$work/trace"
     # A request that fails writes lines, too.
-    ZR_LOG_SINK=file:$work/log ZR_LOG_LEVEL=0 ZR_TRACE_SINK=file:$work/log ZR_TRACE_LEVEL=0 \
+    ZR_LOG_SINK=file:$work/log ZR_LOG_LEVEL=0 ZR_TRACE_SINK=file:$work/trace ZR_TRACE_LEVEL=0 \
         "$program" --tree "$work/tree.json" --data-dir "$work/data" "$@" >"$work/answer" 2>&1 || true
+}
+
+# Standard input without the steps that were told before.
+first_steps() {
+    awk '/^== / { request = $0; previous = ""; next }
+         !told[previous, $0]++ { if (request != "") print request; request = ""; print }
+         { previous = $0 }'
 }
 
 mapfile -t classes < <("$program" --tree "$work/tree.json" --format json classes |
@@ -64,7 +74,11 @@ for class in "${classes[@]}"; do
     ask references "$class.Name=\"nobody\""
 done
 
-"$(dirname "$0")/without-accidents.sh" "$work" <"$work/log" | LC_ALL=C sort -u >"$work/actual"
+here=$(dirname "$0")
+"$here/without-accidents.sh" "$work" <"$work/log" >"$work/logged"
+"$here/without-accidents.sh" "$work" <"$work/trace" >"$work/traced"
+diff -u "$work/logged" "$work/traced"
+first_steps <"$work/logged" >"$work/actual"
 if [[ ${UPDATE_EXPECTED:-} == yes ]]; then
     cp "$work/actual" "$expected"
 fi

@@ -3,6 +3,7 @@
 #include <deque>
 #include <numeric>
 #include <stdexcept>
+#include <utility>
 
 namespace test {
 
@@ -27,6 +28,8 @@ struct State {
     unsigned callsOfFailing = 0;
     Fault fault = Fault::none;
     std::size_t deliveredBeforeFault = 0;
+    Function watched = Function::newInstance;
+    std::function<void()> look;
 
     // The stand-ins of one request.
     std::deque<CMPIObjectPath> paths;
@@ -122,6 +125,9 @@ bool failsNow(Function function) {
     const std::size_t delivered =
         callsOf(Function::returnInstance) + callsOf(Function::returnObjectPath);
     ++callsOf(function);
+    if (state.look && state.watched == function) {
+        state.look();
+    }
     if (state.fault == Fault::none || state.failing != function ||
         ++state.callsOfFailing != state.failingCall) {
         return false;
@@ -464,6 +470,11 @@ void CountedBroker::fail(Function function, unsigned call, Fault fault) {
 
 void CountedBroker::failNothing() {
     state.fault = Fault::none;
+}
+
+void CountedBroker::watch(Function function, std::function<void()> look) {
+    state.watched = function;
+    state.look = std::move(look);
 }
 
 unsigned CountedBroker::calls(Function function) const {

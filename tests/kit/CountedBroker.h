@@ -4,6 +4,7 @@
 
 #include <array>
 #include <cstddef>
+#include <functional>
 #include <string>
 
 namespace test {
@@ -85,6 +86,10 @@ class CountedBroker {
     /// following request.
     void fail(Function function, unsigned call, Fault fault);
     void failNothing();
+
+    /// Calls `look` at the beginning of every call of the function, until another is
+    /// watched or none: with an empty `look`.
+    void watch(Function function, std::function<void()> look);
 
     /// How often a function was called in the last request.
     [[nodiscard]] unsigned calls(Function function) const;

@@ -27,6 +27,25 @@ using ZR::Testing::LogCapture;
 constexpr const char* endpointClass = "QVXZR_DHCPProtocolEndpoint";
 constexpr const char* settingClass = "QVXZR_DHCPSettingData";
 
+/// The entering and exiting lines of the frame in few words.
+std::vector<std::string> flow(const LogCapture& log) {
+    std::vector<std::string> lines;
+    for (const auto& line : log.log()) {
+        EXPECT_EQ(line.file, "DHCPClientProvider");
+        EXPECT_EQ(line.category, "Merrow.DHCPClientProvider");
+        lines.push_back(line.message.substr(0, line.message.find(" in ")));
+    }
+    return lines;
+}
+
+std::string entering(const std::string& function) {
+    return "ENTERING: " + function + "()";
+}
+
+std::string exiting(const std::string& function) {
+    return "EXITING: " + function + "()";
+}
+
 class DHCPClientProviderTest : public test::TreeTest {
   protected:
     static std::vector<unsigned short> identifiers(const char* className) {
@@ -60,6 +79,20 @@ TEST_F(DHCPClientProviderTest, FactoriesDoNotWriteTheStatus) {
     DHCPClientProvider_Create_InstanceMI(host_.broker(), nullptr, &status);
     DHCPClientProvider_Create_AssociationMI(host_.broker(), nullptr, &status);
     EXPECT_EQ(status.rc, CMPI_RC_ERR_NOT_FOUND);
+}
+
+TEST_F(DHCPClientProviderTest, FactoriesTraceTheirEntryAndExit) {
+    const LogCapture log;
+    DHCPClientProvider_Create_InstanceMI(host_.broker(), nullptr, nullptr);
+    DHCPClientProvider_Create_AssociationMI(host_.broker(), nullptr, nullptr);
+    EXPECT_THAT(flow(log), ElementsAre(entering("DHCPClientProvider_Create_InstanceMI"),
+                                       exiting("DHCPClientProvider_Create_InstanceMI"),
+                                       entering("DHCPClientProvider_Create_AssociationMI"),
+                                       exiting("DHCPClientProvider_Create_AssociationMI")));
+    EXPECT_EQ(log.logMessages(), log.traceMessages());
+    EXPECT_THAT(log.log().front().message,
+                ::testing::MatchesRegex(".*List:  broker=0x[0-9a-f]+ ctx=0 rc=0"));
+    EXPECT_EQ(log.log().front().level, 3000);
 }
 
 TEST_F(DHCPClientProviderTest, TablesNameTheirLevelAndThemselvesAndHaveNoEmptySlot) {
@@ -132,6 +165,18 @@ TEST_F(DHCPClientProviderTest, IdentifiersAreAppendedAndNullNamespaceIsLegal) {
     EXPECT_TRUE(ZR::DHCPClientProvider::getClassId(settingClass, nullptr, ids));
     EXPECT_FALSE(ZR::DHCPClientProvider::getClassId("No_SuchClass", nullptr, ids));
     EXPECT_THAT(ids, ElementsAre(1, 85));
+}
+
+TEST_F(DHCPClientProviderTest, ClassIdentificationTracesItsEntryAndExit) {
+    for (const char* name : {settingClass, "CIM_HostedAccessPoint", "No_SuchClass"}) {
+        const LogCapture log;
+        identifiers(name);
+        EXPECT_THAT(flow(log), ElementsAre(entering("getClassId"), exiting("getClassId"))) << name;
+        EXPECT_EQ(log.logMessages(), log.traceMessages());
+        EXPECT_THAT(log.log().front().message, HasSubstr(std::string("List:  className=") + name +
+                                                         " nameSpace=root/cimv2 classIds=0x"));
+        EXPECT_EQ(log.log().front().level, 3000);
+    }
 }
 
 // Instance operations.

@@ -3,25 +3,29 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <array>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "Builders.h"
+#include "Elements.h"
 #include "Lindows/DHCPProtocolEndpoint.h"
-#include "kit/LogCapture.h"
 #include "kit/Tree.h"
 
 namespace {
 
+using test::LogCapture;
 using ::testing::ElementsAre;
-using ::testing::IsEmpty;
 using ZR::Instrumentation;
 using ZR::Moniker;
 using ZR::TracePoint;
 using ZR::TraceSource;
 using ZR::DHCPClientProvider::DHCPProtocolEndpoint;
-using ZR::DHCPClientProvider::Occurrence;
+using ZR::DHCPClientProvider::findKey;
+using ZR::DHCPClientProvider::findKeys;
 using ZR::DHCPClientProvider::requireKey;
+using ZR::DHCPClientProvider::visitKeys;
 
 const std::string logger = ZR::loggerCategory;
 const TraceSource source{"Lindows/AssociationRecordTest", logger};
@@ -33,29 +37,34 @@ class AssociationRecordTest : public test::TreeTest {
 
 TEST_F(AssociationRecordTest, KeysAreVisitedInTheirOrderUntilTheVisitorHasEnough) {
     std::vector<std::string> seen;
-    const auto visit = [&](bool enough) {
+    const auto visit = [&](std::size_t enough) {
         seen.clear();
-        ZR::DHCPClientProvider::visitKeys(moniker_, "Name",
-                                          [&](std::size_t position, const std::string& value) {
-                                              seen.push_back(std::to_string(position) + value);
-                                              return enough;
-                                          });
+        visitKeys(moniker_, [&](std::size_t position, const std::string& name) {
+            std::string value;
+            EXPECT_TRUE(moniker_.getValue(value));
+            seen.push_back(std::to_string(position) + name + '=' + value);
+            return seen.size() == enough;
+        });
     };
-    visit(false);
-    EXPECT_THAT(seen, ElementsAre("0a", "2c"));
-    visit(true);
-    EXPECT_THAT(seen, ElementsAre("0a"));
+    visit(0);
+    EXPECT_THAT(seen, ElementsAre("0Name=a", "1name=b", "2Name=c", "3Key="));
+    visit(2);
+    EXPECT_THAT(seen, ElementsAre("0Name=a", "1name=b"));
 }
 
-TEST_F(AssociationRecordTest, FirstOrLastOfEqualKeysIsFoundAndEveryOneReadIsTraced) {
-    const ZR::Testing::LogCapture log;
-    EXPECT_EQ(findKey(moniker_, "Name", Occurrence::first, ZR_HERE), "a");
-    EXPECT_EQ(log.log().size(), 1U);
-    EXPECT_EQ(findKey(moniker_, "Name", Occurrence::last, ZR_HERE), "c");
-    EXPECT_EQ(log.log().size(), 3U);
-    EXPECT_EQ(findKey(moniker_, "Key", Occurrence::first, ZR_HERE), "") << "there, and empty";
-    EXPECT_EQ(findKey(moniker_, "key", Occurrence::first, ZR_HERE), std::nullopt);
-    EXPECT_EQ(log.log().size(), 4U);
+TEST_F(AssociationRecordTest, FirstOfEqualKeysIsFoundAndTracedAlone) {
+    const LogCapture log;
+    EXPECT_EQ(findKey(moniker_, "Name", ZR_HERE), "a");
+    EXPECT_EQ(findKey(moniker_, "Key", ZR_HERE), "") << "there, and empty";
+    EXPECT_EQ(findKey(moniker_, "key", ZR_HERE), std::nullopt);
+    EXPECT_THAT(test::variables(log.log()), ElementsAre("Name=a", "Key="));
+}
+
+TEST_F(AssociationRecordTest, LastOfEqualKeysCountsWhereSeveralAreFoundAndEachIsTracedInItsPlace) {
+    const LogCapture log;
+    constexpr std::array<std::string_view, 3> names{"Key", "NAME", "Name"};
+    EXPECT_THAT(findKeys(moniker_, names, ZR_HERE), ElementsAre("", std::nullopt, "c"));
+    EXPECT_THAT(test::variables(log.log()), ElementsAre("Name=a", "Name=c", "Key="));
 }
 
 TEST_F(AssociationRecordTest, RequiredKeyThatIsMissingIsThrownWithTheMessage) {

@@ -23,6 +23,7 @@
 #include <string>
 #include <vector>
 
+#include "Lindows/DHCPSettingData.h"
 #include "kit/ChildProcess.h"
 #include "kit/Files.h"
 #include "kit/LogCapture.h"
@@ -387,9 +388,9 @@ TEST_F(ConfigurationFile, ValueThatIsNoLineIsRefusedWithAFailureLine) {
         for (const auto& records : {capture.log(), capture.trace()}) {
             ASSERT_EQ(records.size(), 1U);
             EXPECT_EQ(records[0].level, 6000);
-            EXPECT_EQ(records[0].file, "Lindows/ConfigurationFile");
+            EXPECT_EQ(records[0].file, "Lindows/DHCPSettingData");
             EXPECT_THAT(records[0].message,
-                        MatchesRegex("MESSAGE \\[File: Lindows/ConfigurationFile, Line: "
+                        MatchesRegex("MESSAGE \\[File: Lindows/DHCPSettingData, Line: "
                                      "[0-9]+\\]: The value cannot be one line of the "
                                      "configuration file"));
         }

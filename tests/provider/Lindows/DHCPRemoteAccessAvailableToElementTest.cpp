@@ -8,6 +8,7 @@
 #include <vector>
 
 #include "Builders.h"
+#include "Elements.h"
 #include "kit/Tree.h"
 
 namespace {
@@ -112,6 +113,22 @@ TEST_F(DHCPRemoteAccessAvailableToElementTest, InterfaceWhoseServersCannotBeRead
     EXPECT_THAT(
         build(toEndpoint, {{"Name", "eth0_IPv4"}}),
         fails("InstrumentationException", "Concerned IP Protocol Endpoint Could Not Be Found."));
+}
+
+TEST_F(DHCPRemoteAccessAvailableToElementTest, LastOfEqualKeysCountsAndAllAreReadInTheirOrder) {
+    setTree({host({dhcpInterface("eth0", {"192.0.2.1"})})});
+    const test::LogCapture capture;
+    EXPECT_THAT(build(toEndpoint, {{"SystemName", "first"},
+                                   {"Name", "eth9_IPv4"},
+                                   {"SystemCreationClassName", "Class"},
+                                   {"SystemName", "last"},
+                                   {"Name", "eth0_IPv4"}}),
+                ElementsAre(Pair("Name", "eth0"), Pair("SystemName", "last"),
+                            Pair("SystemCreationClassName", "Class"),
+                            Pair("CreationClassName", "QVXZR_DHCPProtocolEndpoint")));
+    EXPECT_THAT(test::variables(capture.log()),
+                ElementsAre("SystemName=first", "Name=eth9_IPv4", "SystemCreationClassName=Class",
+                            "SystemName=last", "Name=eth0_IPv4", "nameKey=eth0"));
 }
 
 }  // namespace

@@ -13,6 +13,7 @@
 
 namespace {
 
+using namespace std::string_literals;
 using test::build;
 using test::dhcpInterface;
 using test::fails;
@@ -44,6 +45,26 @@ TEST_F(SAPSAPDependencyTest, IPEndpointIsMadeFromWhateverOfTheTwoKeysIsThere) {
         EXPECT_THAT(
             build(builder, {{"CreationClassName", "x"}}),
             fails("FrameworkException", "Could not find 'Name' and 'System Name' Key in Moniker"));
+    }
+}
+
+TEST_F(SAPSAPDependencyTest, LastOfEqualKeysCountsAndAllAreReadInTheirOrder) {
+    setTree({host({dhcpInterface("eth0")})});
+    const Keys keys{{"SystemName", "a"},
+                    {"Name", "b"},
+                    {"Other", "c"},
+                    {"Name", "eth0"},
+                    {"SystemName", hostName()}};
+    for (const auto builder : {toIPEndpoint, toDHCPEndpoint}) {
+        const LogCapture capture;
+        const Keys made = build(builder, keys);
+        ASSERT_GE(made.size(), 2U);
+        EXPECT_EQ(made[0], std::pair("Name"s, "eth0"s));
+        EXPECT_EQ(made[1], std::pair("SystemName"s, hostName()));
+        auto read = test::variables(capture.log());
+        read.resize(4);
+        EXPECT_THAT(read,
+                    ElementsAre("SystemName=a", "Name=b", "Name=eth0", "SystemName=" + hostName()));
     }
 }
 

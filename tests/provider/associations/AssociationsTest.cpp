@@ -4,6 +4,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <string>
 #include <vector>
 
@@ -276,6 +277,20 @@ TEST_F(AssociationsTest, AccessPointAndItsComputerLeadToEachOther) {
                            "Dependent[DHCPRemoteServiceAccessPoint @ eth1_IPv4]",
                            "DHCPRemoteHostedAccessPoint Antecedent[ComputerSystem @] "
                            "Dependent[DHCPRemoteServiceAccessPoint @ eth1_IPv6]"}));
+}
+
+TEST_F(AssociationsTest, EachEndIsAskedOnceInEachStepOfTheWalkOverHostedAccessPoints) {
+    const LogCapture log(4000, 6000);
+    EXPECT_THAT(host_.enumerateNames(pathOf("QVXZR_DHCPRemoteHostedAccessPoint")).paths, SizeIs(3));
+    const auto asked = [lines = log.log()](const std::string& file) {
+        return std::count_if(lines.begin(), lines.end(), [&file](const auto& line) {
+            return line.file == file && line.function == R"(operator\x20bool)";
+        });
+    };
+    EXPECT_EQ(asked("CMPI/CMPIDHCPRemoteHostedAccessPoint"), 4);
+    EXPECT_EQ(asked("CMPI/CMPIDHCPComputerSystem"), 4);
+    // Once more when the computer is located from it.
+    EXPECT_EQ(asked("CMPI/CMPIDHCPRemoteServiceAccessPoint"), 5);
 }
 
 TEST_F(AssociationsTest, OrderOfAccessOfAReferenceDependsOnWhereTheWalkStarted) {
