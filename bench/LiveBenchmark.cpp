@@ -39,7 +39,7 @@
 #include <vector>
 
 #include "OwnMachine.h"
-#include "clients/Clients.h"
+#include "StateReaders.h"
 #include "zrclient/Instrumentation.h"
 #include "zrclient/InstrumentationService.h"
 #include "zrcommon/UniqueFd.h"
@@ -258,8 +258,8 @@ std::set<std::string, std::less<>> kernelThreads() {
 /// Each directory once, with the names of files in it that are read.
 std::map<std::string, std::vector<std::string>> placesToRead() {
     std::map<std::string, std::vector<std::string>> places;
-    for (const ZR::Live::ClientSource& source : ZR::Live::clientSources()) {
-        for (const ZR::Live::ClientPlace& place : source.places) {
+    for (const ZR::Live::StateReader& reader : ZR::Live::stateReaders()) {
+        for (const ZR::Live::StatePlace& place : reader.places) {
             places[std::string{place.directory}].emplace_back(place.namePrefix);
         }
     }

@@ -1,34 +1,39 @@
 #pragma once
 
-#include <arpa/inet.h>
-#include <netinet/in.h>
-#include <sys/socket.h>
-
-#include <array>
 #include <cstdint>
+#include <optional>
 #include <string>
 #include <vector>
 
 #include "Input.h"
-#include "formats/AddressText.h"
+#include "formats/InterfaceName.h"
+#include "formats/IpAddress.h"
 
 namespace fuzz {
 
-/// Whether a text is an address in the one form in which addresses are compared.
-inline bool isAddress(int family, const std::string& text) {
-    return ZR::Live::canonicalAddress(family, text) == text;
+/// The text of an address, which must read back as that address.
+inline std::string textOf(const ZR::Live::IpAddress& address) {
+    std::string text = address.text();
+    require(ZR::Live::IpAddress::fromText(address.family(), text) == address,
+            "an address survives being written");
+    return text;
 }
 
-inline bool isAddress(const std::string& text) {
-    return isAddress(text.find(':') == std::string::npos ? AF_INET : AF_INET6, text);
+/// Empty for none.
+inline std::string textOf(const std::optional<ZR::Live::IpAddress>& address) {
+    return address ? textOf(*address) : std::string();
 }
 
-/// The bytes of a canonical address.
-inline std::vector<std::uint8_t> addressBytes(const std::string& text) {
-    const bool six = text.find(':') != std::string::npos;
-    std::vector<std::uint8_t> bytes(six ? sizeof(in6_addr) : sizeof(in_addr));
-    require(::inet_pton(six ? AF_INET6 : AF_INET, text.c_str(), bytes.data()) == 1,
-            "an address is one");
+/// Empty for none.
+inline std::string textOf(const std::optional<ZR::Live::InterfaceName>& name) {
+    return name ? std::string(name->view()) : std::string();
+}
+
+inline std::vector<std::uint8_t> addressBytes(const ZR::Live::IpAddress& address) {
+    std::vector<std::uint8_t> bytes;
+    for (const std::byte byte : address.bytes()) {
+        bytes.push_back(std::to_integer<std::uint8_t>(byte));
+    }
     return bytes;
 }
 

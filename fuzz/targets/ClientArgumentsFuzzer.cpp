@@ -9,7 +9,6 @@
 #include "clients/Dhcpcd.h"
 #include "clients/Udhcpc.h"
 #include "formats/OptionWalk.h"
-#include "kernel/Link.h"
 
 namespace {
 
@@ -21,8 +20,7 @@ void check(const std::optional<ClientProcess>& process, ZR::Live::Client client)
         return;
     }
     fuzz::require(process->client == client, "a client is the one whose arguments were read");
-    for (const std::string& interface : process->interfaces) {
-        fuzz::require(ZR::Live::isInterfaceName(interface), "a client serves interfaces");
+    for (const ZR::Live::InterfaceName& interface : process->interfaces) {
         fuzz::require(process->serves(interface), "a client serves the interface it names");
     }
 }
@@ -54,9 +52,9 @@ int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
     check(ZR::Live::parseDhcp6cArguments(arguments), ZR::Live::Client::Dhcp6c);
     const auto interfaces = ZR::Live::dhcpcdInterfaces(arguments.front());
     for (std::size_t i = 0; i < interfaces.size(); ++i) {
-        fuzz::require(arguments.front().starts_with(interfaces[i]),
+        fuzz::require(arguments.front().starts_with(interfaces[i].view()),
                       "an interface begins the name of its file");
-        fuzz::require(i == 0 || interfaces[i].size() < interfaces[i - 1].size(),
+        fuzz::require(i == 0 || interfaces[i].view().size() < interfaces[i - 1].view().size(),
                       "the longest name comes first");
     }
     checkWalk(arguments, line);

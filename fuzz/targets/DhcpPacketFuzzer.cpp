@@ -25,8 +25,8 @@ void appendNumber(Message& message, std::uint64_t number, unsigned size) {
 Message written(const ZR::Live::DhcpReply& reply, bool split) {
     Message message(236);
     message[0] = 2;
-    if (!reply.address.empty()) {
-        const Message address = fuzz::addressBytes(reply.address);
+    if (reply.address) {
+        const Message address = fuzz::addressBytes(*reply.address);
         std::copy(address.begin(), address.end(), message.begin() + 16);
     }
     append(message, {0x63, 0x82, 0x53, 0x63});
@@ -37,8 +37,8 @@ Message written(const ZR::Live::DhcpReply& reply, bool split) {
         append(message, {51, 4});
         appendNumber(message, *reply.leaseTime, 4);
     }
-    if (!reply.server.empty()) {
-        const Message server = fuzz::addressBytes(reply.server);
+    if (reply.server) {
+        const Message server = fuzz::addressBytes(*reply.server);
         if (split) {
             append(message, {54, 1, server[0], 0, 54, 3, server[1], server[2], server[3]});
         } else {

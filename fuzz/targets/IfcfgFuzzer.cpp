@@ -20,9 +20,9 @@ int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
     again = fuzz::shellLine("DEVICE", file.device) + fuzz::shellLine("HWADDR", file.hardware) +
             fuzz::shellLine("BOOTPROTO", file.bootProtocol) +
             fuzz::shellLine("DHCPV6C", file.dhcp6 ? "YES" : "no");
-    for (const std::string& address : file.addresses) {
-        fuzz::require(fuzz::isAddress(AF_INET, address), "a fixed address is one");
-        again += fuzz::shellLine("IPADDR_x", address + "/24");
+    for (const auto& address : file.addresses) {
+        fuzz::require(address.isIPv4(), "a fixed address is one of IPv4");
+        again += fuzz::shellLine("IPADDR_x", fuzz::textOf(address) + "/24");
     }
     fuzz::require(ZR::Live::parseIfcfg(again) == file, "settings survive being written");
     fuzz::require(!ZR::Live::isIfcfgName(std::string(text) + ".bak"),

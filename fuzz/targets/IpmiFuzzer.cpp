@@ -1,18 +1,15 @@
 // The responses of a service processor: in pieces of a byte that tells to which request
 // it belongs and how it ends, a byte of the response's length, and the response.
-#include <arpa/inet.h>
-
 #include <cerrno>
 
 #include "Input.h"
 #include "ipmi/IpmiConversation.h"
 #include "ipmi/IpmiMessages.h"
-#include "support/Addresses.h"
 
 namespace {
 
-using ZR::Live::IpmiAnswer;
 using ZR::Live::IpmiRefusal;
+using ZR::Live::IpmiResponse;
 using State = ZR::Live::IpmiConversation::State;
 
 class Processor final : public ZR::Live::IpmiTransport {
@@ -70,14 +67,15 @@ void checkRefusal(const ZR::Live::IpmiDecoded<Facts>& decoded) {
 
 void checkMessages(const std::uint8_t* data, std::size_t size) {
     fuzz::Bytes input(data, size);
-    IpmiAnswer answer{input.number<std::uint8_t>(), input.number<std::uint8_t>(), {}};
+    IpmiResponse answer{input.number<std::uint8_t>(), input.number<std::uint8_t>(), {}};
     const auto rest = input.take(size);
     answer.data.assign(rest.begin(), rest.end());
     const auto address = ZR::Live::decodeLanAddress(answer);
     checkRefusal(address);
-    if (const auto* const text = std::get_if<std::string>(&address)) {
-        fuzz::require(text->empty() || (fuzz::isAddress(AF_INET, *text) && *text != "0.0.0.0"),
-                      "an address is one, and not that which stands for none");
+    using Address = std::optional<ZR::Live::IpAddress>;
+    if (const auto* const found = std::get_if<Address>(&address); found != nullptr && *found) {
+        fuzz::require((*found)->isIPv4() && !(*found)->isUnspecified(),
+                      "an address is one of IPv4, and not that which stands for none");
     }
     const auto source = ZR::Live::decodeLanAddressSource(answer);
     checkRefusal(source);
@@ -106,13 +104,14 @@ void checkConversation(const std::uint8_t* data, std::size_t size) {
         const int before = processor.received;
         now += std::chrono::milliseconds(100);
         static_cast<void>(conversation.continue_(now));
-        fuzz::require(processor.received - before <= 64, "no flood keeps a caller");
+        fuzz::require(processor.received - before <= 64,
+                      "a flood of messages does not keep a caller");
     }
     constexpr int mostRequests = 16;
     fuzz::require(processor.asked <= mostRequests, "requests are few");
     fuzz::require(conversation.state() != State::Underway, "a conversation ends in time");
     if (conversation.state() == State::Failed) {
-        fuzz::require(conversation.complaints().size() == 1, "a failure has a reason");
+        fuzz::require(conversation.diagnostics().size() == 1, "a failure has a reason");
     } else if (const auto& lan = conversation.lan()) {
         fuzz::require(lan->channel < 16, "a channel is a number of four bits");
     }

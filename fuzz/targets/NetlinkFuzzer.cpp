@@ -13,7 +13,6 @@
 #include "kernel/Address.h"
 #include "kernel/Link.h"
 #include "kernel/RtnetlinkReader.h"
-#include "support/Addresses.h"
 
 namespace {
 
@@ -67,12 +66,9 @@ Message written(const Link& link) {
     body.ifi_flags = link.flags;
     body.ifi_type = link.arphrdType;
     Message message = begun(RTM_NEWLINK, body);
-    appendText(message, IFLA_IFNAME, link.name);
+    appendText(message, IFLA_IFNAME, std::string(link.name.view()));
     appendNumber(message, IFLA_OPERSTATE, link.operstate);
     appendNumber(message, IFLA_MASTER, link.master);
-    if (link.netnsid) {
-        appendNumber(message, IFLA_LINK_NETNSID, *link.netnsid);
-    }
     if (link.carrier) {
         appendNumber(message, IFLA_CARRIER, static_cast<std::uint8_t>(*link.carrier ? 1 : 0));
     }
@@ -91,19 +87,15 @@ Message written(const Link& link) {
 
 Message written(const Address& address) {
     ifaddrmsg body{};
-    body.ifa_family = address.family;
+    body.ifa_family = static_cast<unsigned char>(address.ip.family());
     body.ifa_scope = address.scope;
     body.ifa_index = address.ifindex;
     Message message = begun(RTM_NEWADDR, body);
-    const auto bytes = fuzz::addressBytes(address.text);
-    appendAttribute(message, IFA_LOCAL, std::as_bytes(std::span(bytes)));
+    appendAttribute(message, IFA_LOCAL, address.ip.bytes());
     appendNumber(message, IFA_FLAGS, address.flags);
     ifa_cacheinfo cache{};
     cache.ifa_valid = address.validLifetime;
-    cache.ifa_prefered = address.preferredLifetime;
     appendNumber(message, IFA_CACHEINFO, cache);
-    constexpr std::uint16_t protocol = 11;  // IFA_PROTO, which older headers lack
-    appendNumber(message, protocol, address.protocol);
     return ended(std::move(message));
 }
 
@@ -120,16 +112,14 @@ void checkMessage(std::span<const std::byte> bytes) {
     fuzz::require(ZR::Live::parseLink(std::span(moved).subspan(1)) == link,
                   "it does not matter where a message lies");
     if (link) {
-        fuzz::require(link->ifindex != 0 && ZR::Live::isInterfaceName(link->name),
-                      "a link has a number and a name");
+        fuzz::require(link->ifindex != 0, "a link has a number");
         fuzz::require(ZR::Live::parseLink(written(*link)) == link, "a link survives being written");
     }
     const auto address = ZR::Live::parseAddress(bytes);
     fuzz::require(ZR::Live::parseAddress(std::span(moved).subspan(1)) == address,
                   "it does not matter where a message lies");
     if (address) {
-        fuzz::require(address->ifindex != 0 && fuzz::isAddress(address->family, address->text),
-                      "an address is one, of a link");
+        fuzz::require(address->ifindex != 0, "an address is of a link");
         fuzz::require(ZR::Live::parseAddress(written(*address)) == address,
                       "an address survives being written");
     }
@@ -181,13 +171,7 @@ class Responses final : public ZR::Live::NetlinkTransport {
 void checkDump(const std::uint8_t* data, std::size_t size) {
     ZR::Live::RtnetlinkReader reader(std::make_unique<Responses>(fuzz::Bytes(data, size)));
     const auto state = reader.read(ZR::Live::Deadline::max());
-    fuzz::require(state.certain == state.complaints.empty(), "what is not certain is told");
-    for (const Link& link : state.links) {
-        fuzz::require(ZR::Live::isInterfaceName(link.name), "a link has a name");
-    }
-    for (const Address& address : state.addresses) {
-        fuzz::require(fuzz::isAddress(address.family, address.text), "an address is one");
-    }
+    fuzz::require(state.certain == state.diagnostics.empty(), "what is not certain is told");
 }
 
 }  // namespace

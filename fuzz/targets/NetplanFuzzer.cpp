@@ -8,8 +8,8 @@
 #include <fstream>
 
 #include "Input.h"
-#include "clients/Networkd.h"
-#include "kernel/Link.h"
+#include "formats/InterfaceName.h"
+#include "formats/NetworkFile.h"
 
 namespace {
 
@@ -56,12 +56,12 @@ int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
 
     ZR::Live::NetworkFile file;
     ZR::Live::applyNetworkFile(text, file);
-    const bool named = ZR::Live::isInterfaceName(file.matchName) &&
-                       file.matchName.find_first_of("*?[!") == std::string::npos;
+    const auto interface = ZR::Live::InterfaceName::from(file.matchName);
+    const bool named = interface && file.matchName.find_first_of("*?[!") == std::string::npos;
     ZR::Live::ClientFacts expected;
     if (named) {
         expected.configurations.push_back({.client = ZR::Live::Client::Netplan,
-                                           .interfaceName = file.matchName,
+                                           .interfaceName = interface,
                                            .dhcp4 = file.dhcp4,
                                            .dhcp6 = file.dhcp6,
                                            .staticAddresses = file.addresses,

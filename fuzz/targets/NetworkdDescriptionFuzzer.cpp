@@ -12,11 +12,11 @@ using Addresses = std::vector<ZR::Live::NetworkdAddress>;
 std::string written(const Addresses& addresses) {
     nlohmann::json links = nlohmann::json::array();
     for (const auto& address : addresses) {
-        nlohmann::json each{{"Family", address.family},
+        nlohmann::json each{{"Family", address.address.family()},
                             {"Address", fuzz::addressBytes(address.address)},
                             {"ConfigSource", address.source}};
-        if (!address.provider.empty()) {
-            each["ConfigProvider"] = fuzz::addressBytes(address.provider);
+        if (address.provider) {
+            each["ConfigProvider"] = fuzz::addressBytes(*address.provider);
         }
         links.push_back(nlohmann::json{{"Index", address.ifindex},
                                        {"Addresses", nlohmann::json::array({each})}});
@@ -45,9 +45,6 @@ int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
     const auto* const addresses = std::get_if<Addresses>(&parsed);
     if (addresses == nullptr) {
         return 0;
-    }
-    for (const auto& address : *addresses) {
-        fuzz::require(fuzz::isAddress(address.family, address.address), "an address is one");
     }
     const auto again = ZR::Live::parseNetworkdDescription(written(*addresses));
     fuzz::require(again == parsed, "addresses survive being written");

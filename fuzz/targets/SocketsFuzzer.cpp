@@ -9,10 +9,10 @@
 
 namespace {
 
-std::string endPoint(const std::string& address, unsigned port) {
+std::string endPoint(const std::optional<ZR::Live::IpAddress>& address, unsigned port) {
     std::uint32_t number = 0;  // in the order in which the machine keeps it
-    if (!address.empty()) {
-        const auto bytes = fuzz::addressBytes(address);
+    if (address) {
+        const auto bytes = fuzz::addressBytes(*address);
         std::memcpy(&number, bytes.data(), sizeof number);
     }
     std::array<char, 16> text{};
@@ -27,9 +27,8 @@ int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
     const auto sockets = ZR::Live::parseUdpSockets(text);
     std::string again = "  sl  local_address rem_address   st\n";
     for (const auto& socket : sockets) {
-        for (const std::string& address : {socket.address, socket.peer}) {
-            fuzz::require(address.empty() || fuzz::isAddress(AF_INET, address),
-                          "an end is an address");
+        for (const auto& address : {socket.address, socket.peer}) {
+            fuzz::require(!address || address->isIPv4(), "an end is an IPv4 address");
         }
         again +=
             "  11: " + endPoint(socket.address, 68) + ' ' + endPoint(socket.peer, 67) + " 07\n";

@@ -1,7 +1,5 @@
 #include "Decide.h"
 
-#include <sys/socket.h>
-
 #include <algorithm>
 #include <utility>
 
@@ -14,6 +12,23 @@ namespace {
 using NodeLexicon::Properties;
 
 constexpr std::uint64_t hostNameMaxLength = 64;  // HOST_NAME_MAX of Linux
+constexpr const char* computerDescription = "Computer";
+
+/// What was found, in the texts of the tree.
+struct Written {
+    PropertyValue operator()(bool value) const { return value; }
+    PropertyValue operator()(std::uint64_t value) const { return value; }
+    PropertyValue operator()(const InterfaceName& name) const { return std::string{name.view()}; }
+    PropertyValue operator()(const IpAddress& address) const { return address.text(); }
+    PropertyValue operator()(const std::vector<IpAddress>& addresses) const {
+        std::vector<std::string> texts;
+        texts.reserve(addresses.size());
+        for (const IpAddress& address : addresses) {
+            texts.push_back(address.text());
+        }
+        return texts;
+    }
+};
 
 }  // namespace
 
@@ -36,21 +51,20 @@ std::vector<Decision> decide(InterfaceView view) {
         if (!decisions.empty() && decisions.back().property == row.property) {
             continue;
         }
-        auto finding = row.answer(view);
+        const auto finding = row.answer(view);
         if (!finding) {
             continue;
         }
         if (row.property == Properties::IPv4Address) {
             // The rows below speak about this very address.
-            const auto* const text = std::get_if<std::string>(&finding->value);
+            const auto* const ip = std::get_if<IpAddress>(&finding->value);
             const auto own = std::find_if(
-                view.addresses.begin(), view.addresses.end(), [&](const Address& address) {
-                    return address.family == AF_INET && address.text == *text;
-                });
+                view.addresses.begin(), view.addresses.end(),
+                [&](const Address& address) { return ip != nullptr && address.ip == *ip; });
             view.address = own == view.addresses.end() ? nullptr : &*own;
         }
         decisions.push_back({.property = row.property,
-                             .value = std::move(finding->value),
+                             .value = std::visit(Written{}, finding->value),
                              .reason = row.reason,
                              .origin = finding->origin});
     }
@@ -63,7 +77,7 @@ std::shared_ptr<const Snapshot> decide(MachineFacts facts, std::int64_t now, Exp
     if (explain == Explain::Yes) {
         builder.origin("kernel: the name of the system");
     }
-    const auto computer = builder.add(Snapshot::none, "ComputerSystem", "Computer");
+    const auto computer = builder.add(Snapshot::none, "ComputerSystem", computerDescription);
     builder.property(Properties::Name, machine.hostName());
     builder.property(Properties::NameMaxLength, hostNameMaxLength);
     const auto network = builder.add(computer, "Network", "Network");
@@ -85,8 +99,8 @@ std::shared_ptr<const Snapshot> decide(MachineFacts facts, std::int64_t now, Exp
         }
         addServiceProcessor(*machine.serviceProcessor(), builder);
     }
-    for (const std::string& complaint : machine.complaints()) {
-        builder.remark(complaint);
+    for (const std::string& diagnostic : machine.diagnostics()) {
+        builder.remark(diagnostic);
     }
     return builder.build();
 }

@@ -6,15 +6,15 @@
 #include <algorithm>
 #include <cerrno>
 #include <iterator>
-#include <system_error>
 #include <unordered_set>
 #include <utility>
 #include <variant>
 
 #include "Decide.h"
-#include "clients/Clients.h"
+#include "StateReaders.h"
+#include "formats/Files.h"
+#include "formats/SystemErrors.h"
 #include "ipmi/IpmiDevice.h"
-#include "kernel/Sockets.h"
 #include "tklogger/TKLogger.h"
 #include "zrclient/InstrumentationService.h"
 #include "zrcommon/SystemName.h"
@@ -44,8 +44,8 @@ constexpr int clientRounds = 3;
 
 std::vector<WatchedPlace> fixedPlaces(const Roots& roots) {
     std::vector<WatchedPlace> places;
-    for (const ClientSource& source : clientSources()) {
-        for (const ClientPlace& place : source.places) {
+    for (const StateReader& reader : stateReaders()) {
+        for (const StatePlace& place : reader.places) {
             places.push_back({.directory = roots.path(place.directory),
                               .namePrefix = std::string{place.namePrefix}});
         }
@@ -63,20 +63,21 @@ bool isCovered(const std::vector<WatchedPlace>& places, const WatchedPlace& want
 void markWireless(const Roots& roots, std::vector<Link>& links) {
     for (Link& link : links) {
         if (link.hasParentDevice && link.arphrdType == ARPHRD_ETHER && link.kind.empty()) {
-            const std::string path = roots.path("/sys/class/net/") + link.name + "/phy80211";
+            const std::string path =
+                pathIn(pathIn(roots.path("/sys/class/net"), link.name.view()), "phy80211");
             link.wireless = ::access(path.c_str(), F_OK) == 0;
         }
     }
 }
 
 /// Several readers may meet one obstacle.
-void removeRepeated(std::vector<std::string>& complaints) {
+void removeRepeated(std::vector<std::string>& diagnostics) {
     std::unordered_set<std::string> met;
-    std::erase_if(complaints,
-                  [&](const std::string& complaint) { return !met.insert(complaint).second; });
+    std::erase_if(diagnostics,
+                  [&](const std::string& diagnostic) { return !met.insert(diagnostic).second; });
 }
 
-void complainToLog(std::string_view message) {
+void reportToLog(std::string_view message) {
     TKLog::TKLogger::logLevelMessage("zrclient/LiveMachine", "read", __LINE__, "ZR.Instrumentation",
                                      errorLevel, nullptr, 0, 0, message);
 }
@@ -90,8 +91,8 @@ LiveMachine::LiveMachine(Surroundings surroundings)
           surroundings_.ipmi ? std::move(surroundings_.ipmi) : ipmiDevice(surroundings_.roots),
           surroundings_.uptime),
       places_(fixedPlaces(surroundings_.roots)) {
-    if (!surroundings_.complain) {
-        surroundings_.complain = complainToLog;
+    if (!surroundings_.report) {
+        surroundings_.report = reportToLog;
     }
 }
 
@@ -107,9 +108,8 @@ bool LiveMachine::socketsChanged() const {
     if (!sockets_) {
         return false;
     }
-    ClientFacts now;
-    readSockets(surroundings_.roots, now);
-    return now.sockets != sockets_->sockets || now.packetLinks != sockets_->packetLinks;
+    std::vector<std::string> ignored;  // what cannot be read shows as a change
+    return readSockets(surroundings_.roots, ignored) != sockets_;
 }
 
 bool LiveMachine::awaiting() {
@@ -132,8 +132,8 @@ std::shared_ptr<const Snapshot> LiveMachine::tryToRead() {
     ClientFacts clients = readClients();
     consultNetworkd(clients);
     NetworkState network = reader_.read(std::chrono::steady_clock::now() + kernelTime);
-    std::move(network.complaints.begin(), network.complaints.end(),
-              std::back_inserter(clients.complaints));
+    std::move(network.diagnostics.begin(), network.diagnostics.end(),
+              std::back_inserter(clients.diagnostics));
     if (!network.certain) {
         monitor_.markChanged();
     }
@@ -142,21 +142,18 @@ std::shared_ptr<const Snapshot> LiveMachine::tryToRead() {
     }
     sockets_.reset();
     if (clients.socketsStandAlone()) {
-        sockets_.emplace();
-        sockets_->sockets = clients.sockets;
-        sockets_->packetLinks = clients.packetLinks;
+        sockets_ = clients.sockets;
     }
     markWireless(surroundings_.roots, network.links);
     std::string hostName = getSystemName();
     if (hostName.empty()) {
-        clients.complaints.push_back("the system does not tell its name: " +
-                                     std::generic_category().message(errno));
+        clients.diagnostics.push_back("the system does not tell its name: " + reasonOf(errno));
     }
-    planAnotherTry(clients.complaints);
+    planAnotherTry(clients.diagnostics);
     // The service processor is asked again at its own pace.
-    std::optional<ServiceProcessor> processor = processor_.read(clients.complaints);
-    removeRepeated(clients.complaints);
-    report(clients.complaints);
+    std::optional<ServiceProcessor> processor = processor_.read(clients.diagnostics);
+    removeRepeated(clients.diagnostics);
+    report(clients.diagnostics);
     if (hostName.empty()) {
         // Whatever is told bears that name.
         return SnapshotBuilder().build();
@@ -178,10 +175,10 @@ void LiveMachine::consultNetworkd(ClientFacts& clients) {
     if (!manages || !surroundings_.askNetworkd || now < networkdRest_) {
         return;
     }
-    const NetworkdAnswer answer =
+    const NetworkdResponse answer =
         surroundings_.askNetworkd(std::chrono::steady_clock::now() + networkdTime);
     if (!answer.reason.empty()) {
-        clients.complaints.push_back(answer.reason);
+        clients.diagnostics.push_back(answer.reason);
         networkdRest_ = now + networkdPause;
         return;
     }
@@ -190,8 +187,8 @@ void LiveMachine::consultNetworkd(ClientFacts& clients) {
     }
     const auto parsed = parseNetworkdDescription(answer.json);
     if (const auto* const reason = std::get_if<std::string_view>(&parsed)) {
-        clients.complaints.push_back("cannot use what systemd-networkd says: " +
-                                     std::string{*reason});
+        clients.diagnostics.push_back("cannot use what systemd-networkd says: " +
+                                      std::string{*reason});
         return;
     }
     addNetworkdDescription(std::get<std::vector<NetworkdAddress>>(parsed), clients);
@@ -217,9 +214,9 @@ ClientFacts LiveMachine::readClients() {
     ClientFacts facts;
     for (int round = 0; round < clientRounds; ++round) {
         facts = {};
-        monitor_.begin(places_, facts.complaints);
-        for (const ClientSource& source : clientSources()) {
-            source.read(surroundings_.roots, facts);
+        monitor_.begin(places_, facts.diagnostics);
+        for (const StateReader& reader : stateReaders()) {
+            reader.read(surroundings_.roots, facts);
         }
         std::vector<WatchedPlace> wanted = fixedPlaces(surroundings_.roots);
         for (WatchedPlace& place : facts.places) {
@@ -240,26 +237,26 @@ ClientFacts LiveMachine::readClients() {
 }
 
 /// What went wrong for the first time may be over at once.
-void LiveMachine::planAnotherTry(const std::vector<std::string>& complaints) {
+void LiveMachine::planAnotherTry(const std::vector<std::string>& diagnostics) {
     const bool lasts =
-        std::all_of(complaints.begin(), complaints.end(),
-                    [&](const std::string& complaint) { return reported_.contains(complaint); });
-    troubled_ = !complaints.empty();
+        std::all_of(diagnostics.begin(), diagnostics.end(),
+                    [&](const std::string& diagnostic) { return reported_.contains(diagnostic); });
+    troubled_ = !diagnostics.empty();
     troubleRest_ = surroundings_.uptime();
     if (lasts) {
         troubleRest_ += troublePause;
     }
 }
 
-/// Reports what the last reading did not complain about: a lasting trouble is one
+/// Reports what the last reading did not report: a lasting trouble is one
 /// line, however often the machine is read.
-void LiveMachine::report(const std::vector<std::string>& complaints) {
-    for (const std::string& complaint : complaints) {
-        if (!reported_.contains(complaint)) {
-            surroundings_.complain(complaint);
+void LiveMachine::report(const std::vector<std::string>& diagnostics) {
+    for (const std::string& diagnostic : diagnostics) {
+        if (!reported_.contains(diagnostic)) {
+            surroundings_.report(diagnostic);
         }
     }
-    reported_ = {complaints.begin(), complaints.end()};
+    reported_ = {diagnostics.begin(), diagnostics.end()};
 }
 
 }  // namespace ZR::Live

@@ -37,11 +37,11 @@ struct Surroundings {
     std::unique_ptr<IpmiTransport> ipmi = nullptr;
     IpmiReader::Clock uptime = std::chrono::steady_clock::now;
     /// Asks networkd for its description of itself; none: nobody is asked.
-    std::function<NetworkdAnswer(std::chrono::steady_clock::time_point)> askNetworkd =
+    std::function<NetworkdResponse(std::chrono::steady_clock::time_point)> askNetworkd =
         Live::askNetworkd;
     Explain explain = Explain::No;
     /// Takes what could not be read, or not for certain.
-    std::function<void(std::string_view)> complain;
+    std::function<void(std::string_view)> report;
 };
 
 /// The machine as its kernel and its DHCP clients show it now.
@@ -59,15 +59,15 @@ class LiveMachine final : public SnapshotSource {
     void consultNetworkd(ClientFacts& clients);
     void watchProcesses(const ClientFacts& clients);
     [[nodiscard]] bool socketsChanged() const;
-    void planAnotherTry(const std::vector<std::string>& complaints);
-    void report(const std::vector<std::string>& complaints);
+    void planAnotherTry(const std::vector<std::string>& diagnostics);
+    void report(const std::vector<std::string>& diagnostics);
 
     Surroundings surroundings_;
     RtnetlinkReader reader_;
     ChangeMonitor monitor_;
     IpmiReader processor_;
     std::vector<WatchedPlace> places_;
-    std::optional<ClientFacts> sockets_;  // where nothing else tells of who has them
+    std::optional<ClientSockets> sockets_;  // where nothing else tells of who has them
     std::chrono::steady_clock::time_point networkdRest_;  // not to be asked before
     std::unordered_set<std::string> reported_;            // of the last reading
     bool troubled_ = false;                               // something could not be read

@@ -1,7 +1,6 @@
 #include "Machine.h"
 
 #include <linux/if.h>
-#include <sys/socket.h>
 
 #include <algorithm>
 #include <utility>
@@ -16,9 +15,8 @@ constexpr std::int64_t renamedTolerance = 10;  // seconds
 
 const Address* addressOf(const Lease& lease, const InterfaceView& view) {
     const auto found =
-        std::find_if(view.addresses.begin(), view.addresses.end(), [&](const Address& address) {
-            return address.family == lease.family && address.text == lease.address;
-        });
+        std::find_if(view.addresses.begin(), view.addresses.end(),
+                     [&](const Address& address) { return address.ip == lease.address; });
     return found == view.addresses.end() ? nullptr : &*found;
 }
 
@@ -101,11 +99,16 @@ void Machine::collectLeases(std::int64_t now) {
         if (lease.released || (over && !lease.outlivesEnd)) {
             continue;
         }
-        InterfaceView* view = lease.ifindex != 0 ? find(lease.ifindex) : find(lease.interfaceName);
+        InterfaceView* view = nullptr;
+        if (lease.ifindex != 0) {
+            view = find(lease.ifindex);
+        } else if (lease.interfaceName) {
+            view = find(*lease.interfaceName);
+        }
         if (view == nullptr && lease.ifindex == 0) {
             view = findByAddress(lease, now);
-        } else if (view != nullptr && lease.ifindex != 0 && !lease.interfaceName.empty() &&
-                   view->link->name != lease.interfaceName) {
+        } else if (view != nullptr && lease.ifindex != 0 && lease.interfaceName &&
+                   view->link->name != *lease.interfaceName) {
             continue;  // names two links
         }
         if (view == nullptr || addressOf(lease, *view) == nullptr) {
@@ -114,7 +117,7 @@ void Machine::collectLeases(std::int64_t now) {
         if (over) {
             view->formerLease = &lease;
         } else {
-            (lease.family == AF_INET ? view->leases : view->leases6).push_back(&lease);
+            (lease.address.isIPv4() ? view->leases : view->leases6).push_back(&lease);
         }
     }
     const auto alive = [](const Lease* lease) { return lease->clientAlive; };
@@ -131,7 +134,8 @@ void Machine::collectClients() {
         }
     }
     for (const LinkConfiguration& configuration : facts_.clients.configurations) {
-        InterfaceView* const view = find(configuration.interfaceName);
+        InterfaceView* const view =
+            configuration.interfaceName ? find(*configuration.interfaceName) : nullptr;
         if (view != nullptr && view->configuration == nullptr) {
             view->configuration = &configuration;
         }
@@ -151,13 +155,13 @@ void Machine::collectSockets() {
     const bool clientSeen =
         std::any_of(facts_.clients.processes.begin(), facts_.clients.processes.end(),
                     [](const ClientProcess& process) { return !process.ipv6; });
-    for (const PortSocket& socket : facts_.clients.sockets) {
-        if (!socket.address.empty()) {
-            for (const Holder& holder : holders(socket.address)) {
+    for (const PortSocket& socket : facts_.clients.sockets.bound) {
+        if (socket.address) {
+            for (const Holder& holder : holders(*socket.address)) {
                 holder.view->socket = &socket;
             }
         } else if (!clientSeen) {
-            for (const std::uint32_t ifindex : facts_.clients.packetLinks) {
+            for (const std::uint32_t ifindex : facts_.clients.sockets.packetLinks) {
                 if (InterfaceView* const view = find(ifindex)) {
                     view->openSocket = &socket;
                 }
@@ -174,9 +178,9 @@ InterfaceView* Machine::find(std::uint32_t ifindex) {
     return found != views_.end() && found->link->ifindex == ifindex ? &*found : nullptr;
 }
 
-InterfaceView* Machine::find(std::string_view name) {
+InterfaceView* Machine::find(const InterfaceName& name) {
     const auto found = std::lower_bound(byName_.begin(), byName_.end(), name,
-                                        [&](std::size_t position, std::string_view wanted) {
+                                        [&](std::size_t position, const InterfaceName& wanted) {
                                             return views_[position].link->name < wanted;
                                         });
     return found != byName_.end() && views_[*found].link->name == name ? &views_[*found] : nullptr;
@@ -184,8 +188,8 @@ InterfaceView* Machine::find(std::string_view name) {
 
 InterfaceView* Machine::findByAddress(const Lease& lease, std::int64_t now) {
     const auto found = holders(lease.address);
-    const bool meant = found.size() == 1 && (lease.interfaceName.empty() ||
-                                             endsWith(*found.front().address, lease, now));
+    const bool meant =
+        found.size() == 1 && (!lease.interfaceName || endsWith(*found.front().address, lease, now));
     return meant ? found.front().view : nullptr;
 }
 
@@ -197,7 +201,7 @@ void Machine::collectBootLease() {
     const Address* only = nullptr;
     for (InterfaceView& view : views_) {
         for (const Address& address : view.addresses) {
-            if (address.family == AF_INET) {
+            if (address.ip.isIPv4()) {
                 if (only != nullptr) {
                     return;
                 }
@@ -212,12 +216,11 @@ void Machine::collectBootLease() {
     if (spokenFor || only->validLifetime != Address::infinite) {
         return;
     }
-    const BootAnswer& boot = *facts_.clients.boot;
+    const BootResponse& boot = *facts_.clients.boot;
     bootLease_ = Lease{.client = Client::KernelBoot,
                        .interfaceName = {},
                        .ifindex = holder->link->ifindex,
-                       .family = AF_INET,
-                       .address = only->text,
+                       .address = only->ip,
                        .server = boot.server,
                        .bootp = boot.bootp,
                        .expires = Lease::never,
@@ -225,22 +228,21 @@ void Machine::collectBootLease() {
     holder->leases.push_back(&*bootLease_);
 }
 
-std::span<const Machine::Holder> Machine::holders(std::string_view address) {
+std::span<const Machine::Holder> Machine::holders(const IpAddress& address) {
     if (byAddress_.empty()) {
         for (InterfaceView& view : views_) {
             for (const Address& each : view.addresses) {
                 byAddress_.push_back({.address = &each, .view = &view});
             }
         }
-        std::sort(byAddress_.begin(), byAddress_.end(), [](const Holder& a, const Holder& b) {
-            return a.address->text < b.address->text;
-        });
+        std::sort(byAddress_.begin(), byAddress_.end(),
+                  [](const Holder& a, const Holder& b) { return a.address->ip < b.address->ip; });
     }
     const auto first = std::lower_bound(
         byAddress_.begin(), byAddress_.end(), address,
-        [](const Holder& holder, std::string_view text) { return holder.address->text < text; });
+        [](const Holder& holder, const IpAddress& wanted) { return holder.address->ip < wanted; });
     const auto last = std::find_if(first, byAddress_.end(), [&](const Holder& holder) {
-        return holder.address->text != address;
+        return holder.address->ip != address;
     });
     return {first, last};
 }

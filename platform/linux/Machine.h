@@ -5,10 +5,9 @@
 #include <optional>
 #include <span>
 #include <string>
-#include <string_view>
 #include <vector>
 
-#include "clients/Lease.h"
+#include "clients/ClientFacts.h"
 #include "ipmi/ServiceProcessor.h"
 #include "kernel/Address.h"
 #include "kernel/Link.h"
@@ -66,8 +65,8 @@ class Machine {
     [[nodiscard]] const std::optional<ServiceProcessor>& serviceProcessor() const {
         return facts_.serviceProcessor;
     }
-    [[nodiscard]] const std::vector<std::string>& complaints() const {
-        return facts_.clients.complaints;
+    [[nodiscard]] const std::vector<std::string>& diagnostics() const {
+        return facts_.clients.diagnostics;
     }
 
   private:
@@ -82,15 +81,15 @@ class Machine {
     void collectSockets();
     void collectBootLease();
     InterfaceView* find(std::uint32_t ifindex);
-    InterfaceView* find(std::string_view name);
+    InterfaceView* find(const InterfaceName& name);
     InterfaceView* findByAddress(const Lease& lease, std::int64_t now);
-    std::span<const Holder> holders(std::string_view address);
+    std::span<const Holder> holders(const IpAddress& address);
 
     MachineFacts facts_;
     std::optional<Lease> bootLease_;
     std::vector<InterfaceView> views_;  // by ifindex
     std::vector<std::size_t> byName_;   // positions in views_, by name
-    std::vector<Holder> byAddress_;     // by text; made when it is first asked for
+    std::vector<Holder> byAddress_;     // by address; made when it is first asked for
 };
 
 }  // namespace ZR::Live

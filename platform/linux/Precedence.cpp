@@ -2,10 +2,10 @@
 
 #include <linux/if_addr.h>
 #include <linux/rtnetlink.h>
-#include <sys/socket.h>
 
 #include <algorithm>
 #include <array>
+#include <cstddef>
 #include <utility>
 
 #include "kernel/InterfaceRules.h"
@@ -17,41 +17,39 @@ using NodeLexicon::AddressSource;
 using NodeLexicon::Properties;
 using Answer = std::optional<Finding>;
 
-constexpr std::uint64_t interfaceNameMaxLength = 15;  // IFNAMSIZ without the NUL
-
 constexpr std::string_view socketFile = "/proc/net/udp";
 
-PropertyValue source(AddressSource value) {
+FoundValue source(AddressSource value) {
     return std::uint64_t{static_cast<unsigned int>(value)};
 }
 
-Finding kernel(PropertyValue value) {
+Finding kernel(FoundValue value) {
     return {.value = std::move(value)};
 }
-Finding from(const Lease& lease, PropertyValue value) {
+Finding from(const Lease& lease, FoundValue value) {
     return {.value = std::move(value), .origin = {.client = lease.client, .file = lease.origin}};
 }
-Finding from(const LinkConfiguration& configuration, PropertyValue value) {
+Finding from(const LinkConfiguration& configuration, FoundValue value) {
     return {.value = std::move(value),
             .origin = {.client = configuration.client, .file = configuration.origin}};
 }
-Finding from(const ClientProcess& process, PropertyValue value) {
+Finding from(const ClientProcess& process, FoundValue value) {
     return {.value = std::move(value),
             .origin = {.client = process.client, .file = {}, .pid = process.pid}};
 }
-Finding fromSocket(PropertyValue value) {
+Finding fromSocket(FoundValue value) {
     return {.value = std::move(value), .origin = {.client = {}, .file = socketFile}};
 }
 
 bool isUsableIPv4(const Address& address) {
-    return address.family == AF_INET && (address.flags & (IFA_F_TENTATIVE | IFA_F_DADFAILED)) == 0;
+    return address.ip.isIPv4() && (address.flags & (IFA_F_TENTATIVE | IFA_F_DADFAILED)) == 0;
 }
 
 template <typename Condition>
 Answer firstIPv4(const InterfaceView& view, Condition condition) {
     for (const Address& address : view.addresses) {
         if (isUsableIPv4(address) && condition(address)) {
-            return kernel(address.text);
+            return kernel(address.ip);
         }
     }
     return std::nullopt;
@@ -65,13 +63,17 @@ bool isPermanent(const Address& address) {
     return (address.flags & IFA_F_PERMANENT) != 0;
 }
 
+// 169.254/16 (RFC 3927)
+constexpr std::array linkLocalNetwork{std::byte{169}, std::byte{254}};
+
 bool isLinkLocal(const Address& address) {
-    return address.scope == RT_SCOPE_LINK && address.text.starts_with("169.254.");
+    return address.scope == RT_SCOPE_LINK &&
+           std::ranges::equal(address.ip.bytes().first(2), linkLocalNetwork);
 }
 
 const Lease* leaseOf(const InterfaceView& view) {
     for (const Lease* lease : view.leases) {
-        if (view.address != nullptr && lease->address == view.address->text) {
+        if (view.address != nullptr && lease->address == view.address->ip) {
             return lease;
         }
     }
@@ -101,7 +103,7 @@ const LinkConfiguration* intent(const InterfaceView& view) {
 
 bool names(const LinkConfiguration& configuration, const Address& address) {
     const auto& told = configuration.staticAddresses;
-    return std::find(told.begin(), told.end(), address.text) != told.end();
+    return std::find(told.begin(), told.end(), address.ip) != told.end();
 }
 
 AddressSource sourceOf(const Lease& lease) {
@@ -111,18 +113,17 @@ AddressSource sourceOf(const Lease& lease) {
 /// Each server once, that of the interface's own address first. Where two clients
 /// claim one address, only the first is heard: the one that runs.
 Answer servers(const InterfaceView& view) {
-    std::vector<std::string> found;
-    std::vector<std::string_view> heard;
+    std::vector<IpAddress> found;
+    std::vector<IpAddress> heard;
     const Lease* first = nullptr;
     const auto hear = [&](const Lease& lease) {
         if (std::find(heard.begin(), heard.end(), lease.address) != heard.end()) {
             return;
         }
-        heard.emplace_back(lease.address);
-        if (!lease.server.empty() &&
-            std::find(found.begin(), found.end(), lease.server) == found.end()) {
+        heard.push_back(lease.address);
+        if (lease.server && std::find(found.begin(), found.end(), *lease.server) == found.end()) {
             first = first == nullptr ? &lease : first;
-            found.push_back(lease.server);
+            found.push_back(*lease.server);
         }
     };
     if (const Lease* own = leaseOf(view)) {
@@ -139,9 +140,10 @@ Answer servers(const InterfaceView& view) {
 constexpr std::array rows{
     DecisionRow{Properties::Name, "the kernel's name of the link",
                 [](const InterfaceView& view) -> Answer { return kernel(view.link->name); }},
-    DecisionRow{
-        Properties::NameMaxLength, "the kernel takes no longer names",
-        [](const InterfaceView& /*view*/) -> Answer { return kernel(interfaceNameMaxLength); }},
+    DecisionRow{Properties::NameMaxLength, "the kernel takes no longer names",
+                [](const InterfaceView& /*view*/) -> Answer {
+                    return kernel(std::uint64_t{InterfaceName::maxLength});
+                }},
     DecisionRow{Properties::InterfaceState, "administrative and operational state of the link",
                 [](const InterfaceView& view) -> Answer {
                     return kernel(std::uint64_t{isActive(*view.link) ? 1U : 0U});
@@ -260,7 +262,7 @@ constexpr std::array rows{
     DecisionRow{Properties::AddressSource, "a DHCP client listens at this very address",
                 [](const InterfaceView& view) {
                     return view.address != nullptr && view.socket != nullptr &&
-                                   view.socket->address == view.address->text
+                                   view.socket->address == view.address->ip
                                ? Answer{fromSocket(source(AddressSource::DHCP))}
                                : Answer{};
                 }},
@@ -275,7 +277,7 @@ constexpr std::array rows{
         Properties::AddressSource, "set once at the start of the system, and left as it is since",
         [](const InterfaceView& view) -> Answer {
             return view.address != nullptr && view.formerLease != nullptr &&
-                           view.formerLease->address == view.address->text
+                           view.formerLease->address == view.address->ip
                        ? Answer{from(*view.formerLease, source(sourceOf(*view.formerLease)))}
                        : Answer{};
         }},
@@ -360,18 +362,18 @@ constexpr std::array rows{
 
     DecisionRow{Properties::DHCPServerAddresses, "the master owns the addresses of its ports",
                 [](const InterfaceView& view) {
-                    return view.enslaved ? Answer{kernel(std::vector<std::string>{})} : Answer{};
+                    return view.enslaved ? Answer{kernel(std::vector<IpAddress>{})} : Answer{};
                 }},
     DecisionRow{Properties::DHCPServerAddresses, "the servers of the live leases", servers},
     DecisionRow{Properties::DHCPServerAddresses, "the one that the link's DHCP client talks to",
                 [](const InterfaceView& view) {
-                    return view.socket != nullptr && !view.socket->peer.empty()
-                               ? Answer{fromSocket(std::vector{view.socket->peer})}
+                    return view.socket != nullptr && view.socket->peer
+                               ? Answer{fromSocket(std::vector{*view.socket->peer})}
                                : Answer{};
                 }},
     DecisionRow{
         Properties::DHCPServerAddresses, "nobody tells of a server",
-        [](const InterfaceView& /*view*/) -> Answer { return kernel(std::vector<std::string>{}); }},
+        [](const InterfaceView& /*view*/) -> Answer { return kernel(std::vector<IpAddress>{}); }},
 };
 
 }  // namespace

@@ -4,10 +4,13 @@
 #include <optional>
 #include <span>
 #include <string_view>
+#include <variant>
+#include <vector>
 
 #include "Machine.h"
+#include "formats/InterfaceName.h"
+#include "formats/IpAddress.h"
 #include "zrclient/NodeLexicon.h"
-#include "zrclient/Snapshot.h"
 
 namespace ZR::Live {
 
@@ -21,9 +24,13 @@ struct Origin {
     bool operator==(const Origin&) const = default;
 };
 
+/// What the value of a property may be made of. The tree has texts of names and addresses.
+using FoundValue =
+    std::variant<bool, std::uint64_t, InterfaceName, IpAddress, std::vector<IpAddress>>;
+
 /// A value, and what it was taken from.
 struct Finding {
-    PropertyValue value;
+    FoundValue value;
     Origin origin{};
 };
 

@@ -1,10 +1,7 @@
 #include "clients/Connman.h"
 
-#include <sys/socket.h>
-
 #include <utility>
 
-#include "formats/AddressText.h"
 #include "formats/Files.h"
 #include "formats/KeyFile.h"
 
@@ -22,7 +19,7 @@ ConnmanSettings parseConnmanSettings(std::string_view text) {
                    if (key == "IPv4.method") {
                        settings.dhcp4 = value == "dhcp";
                    } else if (key == "IPv4.DHCP.LastAddress") {
-                       settings.lastAddress = canonicalIPv4(value);
+                       settings.lastAddress = IpAddress::ipv4FromText(value);
                    }
                });
     return settings;
@@ -33,21 +30,20 @@ void readConnman(const Roots& roots, ClientFacts& facts) {
         return;
     }
     const std::string directory = roots.path(connmanDirectory);
-    for (const std::string& service : listOptionalDirectory(directory, facts.complaints)) {
+    for (const std::string& service : listOptionalDirectory(directory, facts.diagnostics)) {
         const std::string ofService = pathIn(directory, service);
         // Other files stand beside the services' directories.
         std::string path = pathIn(ofService, settingsName);
-        const auto text = readOptionalFile(path, facts.complaints);
+        const auto text = readOptionalFile(path, facts.diagnostics);
         if (!text) {
             continue;
         }
         facts.places.push_back({.directory = ofService, .namePrefix = std::string{settingsName}});
-        ConnmanSettings settings = parseConnmanSettings(*text);
-        if (settings.dhcp4 && !settings.lastAddress.empty()) {
+        const ConnmanSettings settings = parseConnmanSettings(*text);
+        if (settings.dhcp4 && settings.lastAddress) {
             facts.leases.push_back({.client = Client::Connman,
                                     .interfaceName = {},
-                                    .family = AF_INET,
-                                    .address = std::move(settings.lastAddress),
+                                    .address = *settings.lastAddress,
                                     .server = {},
                                     .clientAlive = true,
                                     .expires = std::nullopt,

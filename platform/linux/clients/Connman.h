@@ -1,9 +1,10 @@
 #pragma once
 
-#include <string>
+#include <optional>
 #include <string_view>
 
-#include "clients/Lease.h"
+#include "clients/ClientFacts.h"
+#include "formats/IpAddress.h"
 #include "formats/Roots.h"
 
 namespace ZR::Live {
@@ -14,7 +15,7 @@ inline constexpr std::string_view connmanDirectory = "/var/lib/connman";
 /// The settings of one service that tell where its address comes from.
 struct ConnmanSettings {
     bool dhcp4 = false;
-    std::string lastAddress;  ///< the last one by DHCP, canonical IPv4 text; empty for none
+    std::optional<IpAddress> lastAddress;  ///< the last one by DHCP
 
     bool operator==(const ConnmanSettings&) const = default;
 };

@@ -1,6 +1,5 @@
 #include "clients/Dhclient.h"
 
-#include <sys/socket.h>
 #include <sys/stat.h>
 
 #include <algorithm>
@@ -12,7 +11,8 @@
 
 #include "clients/DhclientLease.h"
 #include "formats/Files.h"
-#include "kernel/Link.h"
+#include "formats/InterfaceName.h"
+#include "formats/SystemErrors.h"
 
 namespace ZR::Live {
 namespace {
@@ -67,8 +67,8 @@ class LeaseFiles {
     void add(const std::string& path, const ClientProcess* keeper) {
         struct stat status {};
         if (::stat(path.c_str(), &status) != 0) {
-            if (errno != ENOENT && errno != ENOTDIR) {
-                facts_.complaints.push_back(unreadable(path, errno));
+            if (!isAbsent(errno)) {
+                facts_.diagnostics.push_back(unreadable(path, errno));
             }
             return;
         }
@@ -88,7 +88,7 @@ class LeaseFiles {
     }
 
     void addDirectory(const std::string& path, std::string_view prefix) {
-        for (const std::string& name : listOptionalDirectory(path, facts_.complaints)) {
+        for (const std::string& name : listOptionalDirectory(path, facts_.diagnostics)) {
             if (isLeaseFileName(name, prefix)) {
                 add(pathIn(path, name), nullptr);
             }
@@ -138,29 +138,27 @@ bool keeps(const LeaseFile& file, const DhclientLease& lease) {
 }
 
 void addLeases(const LeaseFile& file, ClientFacts& facts) {
-    const auto content = readOptionalFile(file.path, facts.complaints);
+    const auto content = readOptionalFile(file.path, facts.diagnostics);
     if (!content) {
         return;
     }
     // A torn end is the ordinary sight of a client that is writing just now; the
     // rest of it will be noticed like any other change.
-    for (DhclientLease& lease : parseDhclientLeases(*content).leases) {
+    for (const DhclientLease& lease : parseDhclientLeases(*content)) {
         const bool alive = keeps(file, lease);
-        for (DhclientAddress& address : lease.addresses) {
+        for (const DhclientAddress& address : lease.addresses) {
             if (!address.expires) {
                 continue;  // a claim without an end cannot be told from a stale one
             }
-            facts.leases.push_back(
-                {.client = Client::Dhclient,
-                 .interfaceName = lease.interfaceName,
-                 .family = static_cast<std::uint8_t>(lease.ipv6 ? AF_INET6 : AF_INET),
-                 .address = std::move(address.address),
-                 .server = lease.server,
-                 .bootp = lease.bootp,
-                 .released = lease.released,
-                 .clientAlive = alive,
-                 .expires = address.expires,
-                 .origin = file.path});
+            facts.leases.push_back({.client = Client::Dhclient,
+                                    .interfaceName = lease.interfaceName,
+                                    .address = address.address,
+                                    .server = lease.server,
+                                    .bootp = lease.bootp,
+                                    .released = lease.released,
+                                    .clientAlive = alive,
+                                    .expires = address.expires,
+                                    .origin = file.path});
         }
     }
 }
@@ -176,8 +174,8 @@ std::optional<ClientProcess> parseDhclientArguments(std::span<const std::string_
     for (std::size_t i = 1; i < arguments.size(); ++i) {
         const std::string_view argument = arguments[i];
         if (!argument.starts_with('-')) {
-            if (isInterfaceName(argument)) {
-                process.interfaces.emplace_back(argument);
+            if (const auto name = InterfaceName::from(argument)) {
+                process.interfaces.push_back(*name);
             }
         } else if (argument == "-r" || argument == "-x") {
             return std::nullopt;

@@ -6,7 +6,7 @@
 #include <string>
 #include <string_view>
 
-#include "clients/Lease.h"
+#include "clients/ClientFacts.h"
 #include "formats/Roots.h"
 
 namespace ZR::Live {

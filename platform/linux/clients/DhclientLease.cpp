@@ -10,9 +10,7 @@
 #include <utility>
 
 #include "clients/Lease.h"
-#include "formats/AddressText.h"
 #include "formats/Numbers.h"
-#include "kernel/Link.h"
 
 namespace ZR::Live {
 namespace {
@@ -193,13 +191,11 @@ class LeaseFile {
   public:
     explicit LeaseFile(std::string_view text) : tokens_(text) {}
 
-    DhclientLeases parse() {
+    std::vector<DhclientLease> parse() {
         for (;;) {
-            Statement statement = next();
+            const Statement statement = next();
             if (statement.broken()) {
-                result_.torn =
-                    result_.torn || statement.end == Mark::Torn || !statement.words.empty();
-                return std::move(result_);
+                return std::move(leases_);
             }
             if (statement.end != Mark::Open) {
                 continue;
@@ -208,7 +204,7 @@ class LeaseFile {
             if (statement.words.size() == 1 && (ipv6 || statement.keyword() == "lease")) {
                 parseBlock(ipv6);
             } else if (!skipBlock()) {
-                result_.torn = true;
+                return std::move(leases_);
             }
         }
     }
@@ -247,48 +243,53 @@ class LeaseFile {
     }
 
     void parseBlock(bool ipv6) {
-        DhclientLease lease;
-        lease.ipv6 = ipv6;
+        std::optional<InterfaceName> interfaceName;
+        std::vector<DhclientAddress> addresses;
+        std::optional<IpAddress> server;
+        bool bootp = false;
+        bool released = false;
         std::optional<std::int64_t> expires;
         const bool whole = forEachStatement([&](const Statement& statement) {
             const std::string_view keyword = statement.keyword();
             if (statement.end == Mark::Open) {
                 const bool holdsAddresses = keyword == "ia-na" || keyword == "ia-ta";
-                return ipv6 && holdsAddresses ? parseAssociation(lease) : skipBlock();
+                return ipv6 && holdsAddresses ? parseAssociation(addresses) : skipBlock();
             }
             if (keyword == "interface") {
-                lease.interfaceName = statement.word(1);
+                interfaceName = InterfaceName::from(statement.word(1));
             } else if (keyword == "fixed-address" && !ipv6) {
-                if (auto address = canonicalAddress(AF_INET, statement.word(1))) {
-                    lease.addresses = {{.address = *std::move(address), .expires = {}}};
+                if (const auto address = IpAddress::fromText(AF_INET, statement.word(1))) {
+                    addresses = {{.address = *address, .expires = {}}};
                 }
             } else if (keyword == "option" && statement.word(1) == "dhcp-server-identifier") {
-                lease.server = canonicalAddress(AF_INET, statement.word(2)).value_or("");
+                server = IpAddress::fromText(AF_INET, statement.word(2));
             } else if (keyword == "expire") {
                 expires = parseTime({statement.words.begin() + 1, statement.words.end()});
             } else if (keyword == "bootp") {
-                lease.bootp = true;
+                bootp = true;
             } else if (keyword == "released") {
-                lease.released = true;
+                released = true;
             }
             return true;
         });
-        if (!whole) {
-            result_.torn = true;
+        if (!whole || !interfaceName) {
             return;
         }
         if (!ipv6) {
             // A BOOTP reply has no lease time: the address is for ever (RFC 951).
-            if (lease.bootp && !expires) {
+            if (bootp && !expires) {
                 expires = Lease::never;
             }
-            for (DhclientAddress& address : lease.addresses) {
+            for (DhclientAddress& address : addresses) {
                 address.expires = expires;
             }
         }
-        if (isInterfaceName(lease.interfaceName)) {
-            keep(std::move(lease));
-        }
+        keep({.ipv6 = ipv6,
+              .interfaceName = *interfaceName,
+              .addresses = std::move(addresses),
+              .server = server,
+              .bootp = bootp,
+              .released = released});
     }
 
     /// Runs over the statements of a block whose "{" was taken. False when the file
@@ -306,12 +307,12 @@ class LeaseFile {
         }
     }
 
-    bool parseAssociation(DhclientLease& lease) {
+    bool parseAssociation(std::vector<DhclientAddress>& addresses) {
         std::optional<std::int64_t> starts;
         return forEachStatement([&](const Statement& statement) {
             if (statement.end == Mark::Open) {
                 return statement.keyword() == "iaaddr"
-                           ? parseLeasedAddress(statement.word(1), starts, lease)
+                           ? parseLeasedAddress(statement.word(1), starts, addresses)
                            : skipBlock();
             }
             if (statement.keyword() == "starts") {
@@ -322,7 +323,7 @@ class LeaseFile {
     }
 
     bool parseLeasedAddress(std::string_view text, std::optional<std::int64_t> starts,
-                            DhclientLease& lease) {
+                            std::vector<DhclientAddress>& addresses) {
         std::optional<std::uint32_t> lifetime;
         const bool whole = forEachStatement([&](const Statement& statement) {
             if (statement.end == Mark::Open) {
@@ -335,10 +336,8 @@ class LeaseFile {
             }
             return true;
         });
-        auto address = canonicalAddress(AF_INET6, text);
-        if (address) {
-            lease.addresses.push_back(
-                {.address = *std::move(address), .expires = end(starts, lifetime)});
+        if (const auto address = IpAddress::fromText(AF_INET6, text)) {
+            addresses.push_back({.address = *address, .expires = end(starts, lifetime)});
         }
         return whole;
     }
@@ -355,24 +354,24 @@ class LeaseFile {
     }
 
     void keep(DhclientLease&& lease) {
-        const auto older = std::find_if(
-            result_.leases.begin(), result_.leases.end(), [&](const DhclientLease& kept) {
+        const auto older =
+            std::find_if(leases_.begin(), leases_.end(), [&](const DhclientLease& kept) {
                 return kept.ipv6 == lease.ipv6 && kept.interfaceName == lease.interfaceName;
             });
-        if (older != result_.leases.end()) {
+        if (older != leases_.end()) {
             *older = std::move(lease);
         } else {
-            result_.leases.push_back(std::move(lease));
+            leases_.push_back(std::move(lease));
         }
     }
 
     Tokens tokens_;
-    DhclientLeases result_;
+    std::vector<DhclientLease> leases_;
 };
 
 }  // namespace
 
-DhclientLeases parseDhclientLeases(std::string_view text) {
+std::vector<DhclientLease> parseDhclientLeases(std::string_view text) {
     return LeaseFile{text}.parse();
 }
 

@@ -1,7 +1,7 @@
 #include "clients/Dhcp6c.h"
 
+#include "formats/InterfaceName.h"
 #include "formats/OptionWalk.h"
-#include "kernel/Link.h"
 
 namespace ZR::Live {
 
@@ -13,8 +13,9 @@ std::optional<ClientProcess> parseDhcp6cArguments(std::span<const std::string_vi
         .client = Client::Dhcp6c, .interfaces = {}, .leaseFile = {}, .ipv6 = true};
     OptionWalk walk{arguments.subspan(1), "cpkP", {}};
     for (CommandOption option; walk.next(option);) {
-        if (option.isOperand() && isInterfaceName(option.value)) {
-            process.interfaces.emplace_back(option.value);
+        const auto name = InterfaceName::from(option.value);
+        if (option.isOperand() && name) {
+            process.interfaces.push_back(*name);
         }
     }
     return process;

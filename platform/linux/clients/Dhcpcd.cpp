@@ -1,6 +1,5 @@
 #include "clients/Dhcpcd.h"
 
-#include <sys/socket.h>
 #include <sys/stat.h>
 
 #include <algorithm>
@@ -11,7 +10,6 @@
 #include "formats/DhcpPacket.h"
 #include "formats/Files.h"
 #include "formats/OptionWalk.h"
-#include "kernel/Link.h"
 
 namespace ZR::Live {
 namespace {
@@ -41,8 +39,8 @@ std::optional<ClientProcess> parseTitle(std::string_view title) {
     ClientProcess process{.client = Client::Dhcpcd, .interfaces = {}, .leaseFile = {}};
     const std::string_view subject = title.substr(0, title.find(' '));
     // "[master]" up to version 9.4.0, "[manager]" since: all links.
-    if (isInterfaceName(subject) && !subject.starts_with('[')) {
-        process.interfaces.emplace_back(subject);
+    if (const auto name = InterfaceName::from(subject); name && !subject.starts_with('[')) {
+        process.interfaces.push_back(*name);
     } else if (!subject.starts_with("[manager]") && !subject.starts_with("[master]")) {
         return std::nullopt;
     }
@@ -64,7 +62,7 @@ std::int64_t end(std::int64_t start, std::uint32_t lifetime) {
 struct LeaseFile {
     std::string path;
     std::int64_t written = 0;  // epoch seconds
-    std::vector<std::string> interfaces;
+    std::vector<InterfaceName> interfaces;
 };
 
 class Reader {
@@ -76,7 +74,7 @@ class Reader {
         // other half is there in no time.
         std::optional<std::string_view> reason;
         for (int attempt = 0; attempt < 2; ++attempt) {
-            const auto content = readOptionalFile(file.path, facts_.complaints);
+            const auto content = readOptionalFile(file.path, facts_.diagnostics);
             if (!content || content->empty()) {
                 return;
             }
@@ -85,7 +83,7 @@ class Reader {
                 return;
             }
         }
-        facts_.complaints.push_back("cannot use " + file.path + ": " + std::string{*reason});
+        facts_.diagnostics.push_back("cannot use " + file.path + ": " + std::string{*reason});
     }
 
   private:
@@ -97,11 +95,10 @@ class Reader {
         const auto& reply = std::get<DhcpReply>(parsed);
         // A BOOTP reply has no lease time: the address is for ever (RFC 951). A DHCP one
         // without is the answer to a question for settings alone.
-        if (!reply.address.empty() && (reply.leaseTime || reply.bootp)) {
+        if (reply.address && (reply.leaseTime || reply.bootp)) {
             Lease lease{.client = Client::Dhcpcd,
                         .interfaceName = {},
-                        .family = AF_INET,
-                        .address = reply.address,
+                        .address = *reply.address,
                         .server = reply.server,
                         .bootp = reply.bootp,
                         .expires = end(file.written, reply.leaseTime.value_or(UINT32_MAX)),
@@ -119,7 +116,6 @@ class Reader {
         for (const Dhcp6Address& address : std::get<Dhcp6Reply>(parsed).addresses) {
             Lease lease{.client = Client::Dhcpcd,
                         .interfaceName = {},
-                        .family = AF_INET6,
                         .address = address.address,
                         .server = {},
                         .expires = end(file.written, address.validLifetime),
@@ -131,14 +127,14 @@ class Reader {
 
     /// The kernel's addresses tell which of the interfaces is meant.
     void addForEach(const LeaseFile& file, Lease&& lease) {
-        for (const std::string& interface : file.interfaces) {
+        for (const InterfaceName& interface : file.interfaces) {
             lease.interfaceName = interface;
             lease.clientAlive = runsOn(interface);
             facts_.leases.push_back(lease);
         }
     }
 
-    [[nodiscard]] bool runsOn(const std::string& interface) const {
+    [[nodiscard]] bool runsOn(const InterfaceName& interface) const {
         return std::any_of(facts_.processes.begin(), facts_.processes.end(),
                            [&](const ClientProcess& process) {
                                return process.client == Client::Dhcpcd && process.serves(interface);
@@ -163,8 +159,9 @@ std::optional<ClientProcess> parseDhcpcdArguments(std::span<const std::string_vi
         if (isCommand(option)) {
             return std::nullopt;
         }
-        if (option.isOperand() && isInterfaceName(option.value)) {
-            process.interfaces.emplace_back(option.value);
+        const auto name = InterfaceName::from(option.value);
+        if (option.isOperand() && name) {
+            process.interfaces.push_back(*name);
         } else if (option.letter == '6' || option.longName == "ipv6only") {
             process.ipv6 = true;
         }
@@ -172,12 +169,12 @@ std::optional<ClientProcess> parseDhcpcdArguments(std::span<const std::string_vi
     return process;
 }
 
-std::vector<std::string> dhcpcdInterfaces(std::string_view stem) {
-    std::vector<std::string> interfaces;
+std::vector<InterfaceName> dhcpcdInterfaces(std::string_view stem) {
+    std::vector<InterfaceName> interfaces;
     for (std::size_t length = stem.size(); length != 0 && length != std::string_view::npos;
          length = stem.rfind('-', length - 1)) {
-        if (isInterfaceName(stem.substr(0, length))) {
-            interfaces.emplace_back(stem.substr(0, length));
+        if (const auto name = InterfaceName::from(stem.substr(0, length))) {
+            interfaces.push_back(*name);
         }
     }
     return interfaces;
@@ -187,7 +184,7 @@ void readDhcpcd(const Roots& roots, ClientFacts& facts) {
     Reader reader{facts};
     for (const DhcpcdDirectory& place : dhcpcdDirectories) {
         const std::string directory = roots.path(place.path);
-        for (const std::string& name : listOptionalDirectory(directory, facts.complaints)) {
+        for (const std::string& name : listOptionalDirectory(directory, facts.diagnostics)) {
             std::string_view stem{name};
             const bool ipv6 = stem.ends_with(".lease6");
             if (!stem.starts_with(place.namePrefix) || (!ipv6 && !stem.ends_with(".lease"))) {

@@ -3,11 +3,11 @@
 #include <array>
 #include <optional>
 #include <span>
-#include <string>
 #include <string_view>
 #include <vector>
 
-#include "clients/Lease.h"
+#include "clients/ClientFacts.h"
+#include "formats/InterfaceName.h"
 #include "formats/Roots.h"
 
 namespace ZR::Live {
@@ -31,7 +31,7 @@ inline constexpr std::array<DhcpcdDirectory, 3> dhcpcdDirectories{{
 
 /// The interfaces that the stem of a lease file's name may mean, the longest first: of
 /// a wireless link the network's name stands behind it, and both may have a "-".
-[[nodiscard]] std::vector<std::string> dhcpcdInterfaces(std::string_view stem);
+[[nodiscard]] std::vector<InterfaceName> dhcpcdInterfaces(std::string_view stem);
 
 /// Adds the leases of all known places. Needs the processes to be in the facts.
 void readDhcpcd(const Roots& roots, ClientFacts& facts);

@@ -1,8 +1,12 @@
 #pragma once
 
+#include <cstdint>
+#include <optional>
 #include <string_view>
 
-#include "clients/Lease.h"
+#include "clients/ClientFacts.h"
+#include "formats/InterfaceName.h"
+#include "formats/IpAddress.h"
 #include "formats/Roots.h"
 
 namespace ZR::Live {
@@ -16,11 +20,11 @@ inline constexpr std::string_view ipconfigPrefix = "net-";
 struct IpconfigResult {
     enum class Protocol : std::uint8_t { Other, Dhcp, Bootp };
 
-    std::string interfaceName;
+    std::optional<InterfaceName> interfaceName;
     Protocol protocol = Protocol::Other;
-    std::string address;          ///< canonical IPv4 text; empty for none
-    std::string server;           ///< of the boot files, the best guess at the DHCP server
-    std::uint32_t leaseTime = 0;  ///< seconds; 0 and UINT32_MAX: for ever
+    std::optional<IpAddress> address;
+    std::optional<IpAddress> server;  ///< of the boot files, the best guess at the DHCP server
+    std::uint32_t leaseTime = 0;      ///< seconds; 0 and UINT32_MAX: for ever
 
     bool operator==(const IpconfigResult&) const = default;
 };

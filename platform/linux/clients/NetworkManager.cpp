@@ -1,18 +1,15 @@
 #include "clients/NetworkManager.h"
 
-#include <sys/socket.h>
 #include <sys/stat.h>
 
 #include <algorithm>
 #include <cstddef>
 #include <utility>
 
-#include "clients/Networkd.h"
-#include "formats/AddressText.h"
 #include "formats/Files.h"
 #include "formats/KeyFile.h"
+#include "formats/NetworkdLease.h"
 #include "formats/Numbers.h"
-#include "kernel/Link.h"
 
 namespace ZR::Live {
 namespace {
@@ -32,13 +29,13 @@ bool isAddressKey(std::string_view key) {
 }
 
 /// Takes "ADDRESS/LENGTH,GATEWAY", or in the older form a list with ";" between.
-void addAddresses(std::string_view value, std::vector<std::string>& addresses) {
+void addAddresses(std::string_view value, std::vector<IpAddress>& addresses) {
     while (!value.empty()) {
         const std::size_t end = std::min(value.find(';'), value.size());
         const std::string_view item = value.substr(0, end);
         value.remove_prefix(std::min(end + 1, value.size()));
-        if (auto address = canonicalIPv4(item.substr(0, item.find(','))); !address.empty()) {
-            addresses.push_back(std::move(address));
+        if (const auto address = IpAddress::ipv4FromText(item.substr(0, item.find(',')))) {
+            addresses.push_back(*address);
         }
     }
 }
@@ -52,9 +49,9 @@ std::vector<ProfileFile> readProfiles(const Roots& roots, ClientFacts& facts) {
     std::vector<ProfileFile> profiles;
     for (const std::string_view directory : networkManagerProfiles) {
         const std::string place = roots.path(directory);
-        for (const std::string& name : listOptionalDirectory(place, facts.complaints)) {
+        for (const std::string& name : listOptionalDirectory(place, facts.diagnostics)) {
             std::string path = pathIn(place, name);
-            if (const auto text = readOptionalFile(path, facts.complaints)) {
+            if (const auto text = readOptionalFile(path, facts.diagnostics)) {
                 profiles.push_back(
                     {.path = std::move(path), .profile = parseNetworkManagerProfile(*text)});
             }
@@ -125,24 +122,23 @@ void readDevices(const Roots& roots, const std::vector<ProfileFile>& profiles, C
     }
     const bool alive = facts.runs(Client::NetworkManager);
     const std::string devices = roots.path(networkManagerDevices);
-    for (const std::string& name : listOptionalDirectory(devices, facts.complaints)) {
+    for (const std::string& name : listOptionalDirectory(devices, facts.diagnostics)) {
         const auto ifindex = parseNumber<std::uint32_t>(name);
         std::string path = pathIn(devices, name);
-        const auto text = ifindex ? readOptionalFile(path, facts.complaints) : std::nullopt;
+        const auto text = ifindex ? readOptionalFile(path, facts.diagnostics) : std::nullopt;
         if (!text) {
             continue;
         }
-        NetworkManagerDevice device = parseNetworkManagerDevice(*text);
+        const NetworkManagerDevice device = parseNetworkManagerDevice(*text);
         if (alive && device.managed) {
             addManagement(*ifindex, device, path, profiles, facts);
         }
-        if (!device.address4.empty()) {
+        if (device.address4) {
             facts.leases.push_back({.client = Client::NetworkManager,
                                     .interfaceName = {},
                                     .ifindex = *ifindex,
-                                    .family = AF_INET,
-                                    .address = std::move(device.address4),
-                                    .server = std::move(device.server4),
+                                    .address = *device.address4,
+                                    .server = device.server4,
                                     .clientAlive = alive,
                                     .expires = device.expires4,
                                     .origin = std::move(path)});
@@ -154,24 +150,23 @@ void readDevices(const Roots& roots, const std::vector<ProfileFile>& profiles, C
 /// order to ask for it again: it may be anybody's by now, and proves nothing.
 void readInternalLeases(const Roots& roots, ClientFacts& facts) {
     const std::string directory = roots.path(networkManagerState);
-    for (const std::string& name : listOptionalDirectory(directory, facts.complaints)) {
-        auto interface = internalLeaseInterface(name);
+    for (const std::string& name : listOptionalDirectory(directory, facts.diagnostics)) {
+        const auto interface = internalLeaseInterface(name);
         std::string path = pathIn(directory, name);
         struct stat status {};
         if (!interface || ::stat(path.c_str(), &status) != 0) {
             continue;
         }
-        const auto text = readOptionalFile(path, facts.complaints);
-        NetworkdLease lease = parseNetworkdLease(text.value_or(""));
-        if (lease.address.empty() || !lease.lifetime) {
+        const auto text = readOptionalFile(path, facts.diagnostics);
+        const NetworkdLease lease = parseNetworkdLease(text.value_or(""));
+        if (!lease.address || !lease.lifetime) {
             continue;
         }
         const bool endless = *lease.lifetime >= UINT32_MAX;
         facts.leases.push_back({.client = Client::NetworkManager,
-                                .interfaceName = *std::move(interface),
-                                .family = AF_INET,
-                                .address = std::move(lease.address),
-                                .server = std::move(lease.server),
+                                .interfaceName = interface,
+                                .address = *lease.address,
+                                .server = lease.server,
                                 .expires = endless ? Lease::never
                                                    : status.st_mtim.tv_sec +
                                                          static_cast<std::int64_t>(*lease.lifetime),
@@ -193,9 +188,9 @@ NetworkManagerDevice parseNetworkManagerDevice(std::string_view text) {
         } else if (section == "dhcp4") {
             device.dhcp4 = true;
             if (key == "dhcp4.ip_address") {
-                device.address4 = canonicalIPv4(value);
+                device.address4 = IpAddress::ipv4FromText(value);
             } else if (key == "dhcp4.dhcp_server_identifier") {
-                device.server4 = canonicalIPv4(value);
+                device.server4 = IpAddress::ipv4FromText(value);
             } else if (key == "dhcp4.expiry") {
                 // A time that cannot be read is over.
                 device.expires4 = parseNumber<std::int64_t>(value).value_or(0);
@@ -214,7 +209,7 @@ NetworkManagerProfile parseNetworkManagerProfile(std::string_view text) {
             if (key == "uuid") {
                 profile.uuid = value;
             } else if (key == "interface-name") {
-                profile.interfaceName = value;
+                profile.interfaceName = InterfaceName::from(value);
             }
         } else if (section == "ipv4") {
             if (key == "method") {
@@ -231,7 +226,7 @@ NetworkManagerProfile parseNetworkManagerProfile(std::string_view text) {
     return profile;
 }
 
-std::optional<std::string> internalLeaseInterface(std::string_view fileName) {
+std::optional<InterfaceName> internalLeaseInterface(std::string_view fileName) {
     if (!fileName.starts_with(internalLeasePrefix) || !fileName.ends_with(leaseSuffix)) {
         return std::nullopt;
     }
@@ -240,8 +235,7 @@ std::optional<std::string> internalLeaseInterface(std::string_view fileName) {
     if (fileName.size() <= uuidLength + 1 || fileName[uuidLength] != '-') {
         return std::nullopt;
     }
-    const std::string_view interface = fileName.substr(uuidLength + 1);
-    return isInterfaceName(interface) ? std::optional{std::string{interface}} : std::nullopt;
+    return InterfaceName::from(fileName.substr(uuidLength + 1));
 }
 
 void readNetworkManager(const Roots& roots, ClientFacts& facts) {
@@ -249,7 +243,7 @@ void readNetworkManager(const Roots& roots, ClientFacts& facts) {
     readDevices(roots, profiles, facts);
     readInternalLeases(roots, facts);
     for (const ProfileFile& file : profiles) {
-        if (isInterfaceName(file.profile.interfaceName) && !file.profile.external) {
+        if (file.profile.interfaceName && !file.profile.external) {
             LinkConfiguration configuration = configurationOf(file);
             configuration.interfaceName = file.profile.interfaceName;
             facts.configurations.push_back(std::move(configuration));

@@ -7,7 +7,9 @@
 #include <string_view>
 #include <vector>
 
-#include "clients/Lease.h"
+#include "clients/ClientFacts.h"
+#include "formats/InterfaceName.h"
+#include "formats/IpAddress.h"
 #include "formats/Roots.h"
 
 namespace ZR::Live {
@@ -26,8 +28,8 @@ struct NetworkManagerDevice {
     std::string profile;                   ///< UUID of the active connection; empty for none
     bool dhcp4 = false;                    ///< there is a DHCPv4 lease
     bool dhcp6 = false;                    ///< there is a DHCPv6 lease
-    std::string address4;                  ///< leased, canonical text
-    std::string server4;                   ///< DHCP option 54, canonical text
+    std::optional<IpAddress> address4;     ///< leased
+    std::optional<IpAddress> server4;      ///< DHCP option 54
     std::int64_t expires4 = Lease::never;  ///< epoch seconds; the file names no infinite one
 
     bool operator==(const NetworkManagerDevice&) const = default;
@@ -37,18 +39,18 @@ struct NetworkManagerDevice {
 /// A connection profile: a key file NAME.nmconnection.
 struct NetworkManagerProfile {
     std::string uuid;  ///< empty when the program derives it from the file's name
-    std::string interfaceName;
-    std::string method4;                  ///< "auto", "manual", "link-local", "shared", ...
-    std::string method6;                  ///< "auto", "dhcp", ...
-    std::vector<std::string> addresses4;  ///< canonical text, without prefix length
-    bool external = false;                ///< describes what others have set up
+    std::optional<InterfaceName> interfaceName;
+    std::string method4;  ///< "auto", "manual", "link-local", "shared", ...
+    std::string method6;  ///< "auto", "dhcp", ...
+    std::vector<IpAddress> addresses4;
+    bool external = false;  ///< describes what others have set up
 
     bool operator==(const NetworkManagerProfile&) const = default;
 };
 [[nodiscard]] NetworkManagerProfile parseNetworkManagerProfile(std::string_view text);
 
 /// The interface in the name internal-UUID-INTERFACE.lease; nullopt for other names.
-[[nodiscard]] std::optional<std::string> internalLeaseInterface(std::string_view fileName);
+[[nodiscard]] std::optional<InterfaceName> internalLeaseInterface(std::string_view fileName);
 
 /// Adds leases, managements and profiles. Needs the processes to be in the facts:
 /// the state files outlive the program.

@@ -9,11 +9,10 @@
 #include <memory>
 #include <nlohmann/json.hpp>
 #include <optional>
-#include <system_error>
 #include <utility>
 
 #include "clients/SdBus.h"
-#include "formats/AddressText.h"
+#include "formats/SystemErrors.h"
 
 namespace ZR::Live {
 namespace {
@@ -24,19 +23,19 @@ using Deadline = std::chrono::steady_clock::time_point;
 constexpr const char* service = "org.freedesktop.network1";
 constexpr std::string_view origin = "D-Bus org.freedesktop.network1";
 
-/// The address in an array of the numbers of its bytes; empty for anything else.
-std::string addressOf(const Json& value, int family) {
+/// The address in an array of the numbers of its bytes; nullopt for anything else.
+std::optional<IpAddress> addressOf(const Json& value, int family) {
     std::vector<std::byte> bytes;
     if (!value.is_array()) {
-        return {};
+        return std::nullopt;
     }
     for (const Json& number : value) {
         if (!number.is_number_unsigned() || number.get<std::uint64_t>() > UINT8_MAX) {
-            return {};
+            return std::nullopt;
         }
         bytes.push_back(static_cast<std::byte>(number.get<std::uint8_t>()));
     }
-    return addressText(family, bytes).value_or("");
+    return IpAddress::fromBytes(family, bytes);
 }
 
 /// The member of an object; null where it has none, or is no object.
@@ -65,12 +64,10 @@ void addAddresses(const Json& link, std::vector<NetworkdAddress>& addresses) {
         if (number != AF_INET && number != AF_INET6) {
             continue;
         }
-        const auto family = number.get<std::uint8_t>();
-        std::string address = addressOf(member(each, "Address"), family);
-        if (!address.empty()) {
+        const int family = number.get<std::uint8_t>();
+        if (const auto address = addressOf(member(each, "Address"), family)) {
             addresses.push_back({.ifindex = index.get<std::uint32_t>(),
-                                 .family = family,
-                                 .address = std::move(address),
+                                 .address = *address,
                                  .source = textOf(member(each, "ConfigSource")),
                                  .provider = addressOf(member(each, "ConfigProvider"), family)});
         }
@@ -135,12 +132,12 @@ int awaitReady(sd_bus* bus, Deadline deadline) {
     }
 }
 
-NetworkdAnswer failure(const std::string& reason) {
+NetworkdResponse failure(const std::string& reason) {
     return {.json = {}, .reason = "systemd-networkd cannot be asked: " + reason};
 }
 
-NetworkdAnswer failure(int error) {
-    return failure(std::generic_category().message(error));
+NetworkdResponse failure(int error) {
+    return failure(reasonOf(error));
 }
 
 }  // namespace
@@ -162,7 +159,7 @@ Parsed<std::vector<NetworkdAddress>> parseNetworkdDescription(std::string_view j
     return addresses;
 }
 
-NetworkdAnswer askNetworkd(Deadline deadline) {
+NetworkdResponse askNetworkd(Deadline deadline) {
     const std::shared_ptr<const SdBus> functions = SdBus::get();
     if (!functions->missing().empty()) {
         return failure(functions->missing());
@@ -172,7 +169,7 @@ NetworkdAnswer askNetworkd(Deadline deadline) {
     const Bus bus{opened};
     if (open < 0) {
         // Many a machine has networkd and no bus.
-        return open == -ENOENT || open == -ECONNREFUSED ? NetworkdAnswer{} : failure(-open);
+        return open == -ENOENT || open == -ECONNREFUSED ? NetworkdResponse{} : failure(-open);
     }
     if (const int error = awaitReady(bus.get(), deadline); error != 0) {
         return failure(error);
@@ -199,7 +196,7 @@ NetworkdAnswer askNetworkd(Deadline deadline) {
         const bool absent = error.is(SD_BUS_ERROR_SERVICE_UNKNOWN) ||
                             error.is(SD_BUS_ERROR_NAME_HAS_NO_OWNER) ||
                             error.is(SD_BUS_ERROR_UNKNOWN_METHOD);  // before version 250
-        return absent ? NetworkdAnswer{} : failure(-call);
+        return absent ? NetworkdResponse{} : failure(-call);
     }
     const char* text = nullptr;
     if (const int read = functions->readBasic(answer.get(), SD_BUS_TYPE_STRING, &text); read < 0) {
@@ -222,14 +219,13 @@ void addNetworkdDescription(const std::vector<NetworkdAddress>& addresses, Clien
                 facts.leases.push_back({.client = Client::Networkd,
                                         .interfaceName = {},
                                         .ifindex = address.ifindex,
-                                        .family = address.family,
                                         .address = address.address,
                                         .server = address.provider,
                                         .clientAlive = true,
                                         .expires = {},
                                         .origin = std::string{origin}});
             }
-        } else if (address.source == "static" && address.family == AF_INET) {
+        } else if (address.source == "static" && address.address.isIPv4()) {
             const auto management =
                 std::find_if(facts.managements.begin(), facts.managements.end(), isOfThatLink);
             if (management != facts.managements.end()) {

@@ -2,22 +2,23 @@
 
 #include <chrono>
 #include <cstdint>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
 
-#include "clients/Lease.h"
-#include "formats/DhcpPacket.h"
+#include "clients/ClientFacts.h"
+#include "formats/IpAddress.h"
+#include "formats/Parsed.h"
 
 namespace ZR::Live {
 
 /// What networkd says of one address of a link.
 struct NetworkdAddress {
     std::uint32_t ifindex = 0;
-    std::uint8_t family = 0;  ///< AF_INET or AF_INET6
-    std::string address;      ///< canonical text
-    std::string source;       ///< "DHCPv4", "DHCPv6", "static", "IPv4LL", "foreign", ...
-    std::string provider;     ///< the server that gave it, canonical text; empty for none
+    IpAddress address;
+    std::string source;                 ///< "DHCPv4", "DHCPv6", "static", "IPv4LL", "foreign", ...
+    std::optional<IpAddress> provider;  ///< the server that gave it
 
     bool operator==(const NetworkdAddress&) const = default;
 };
@@ -28,17 +29,17 @@ struct NetworkdAddress {
 
 /// A description as text, or the reason why there is none; both empty where there is
 /// no bus or no networkd to be asked.
-struct NetworkdAnswer {
+struct NetworkdResponse {
     std::string json;
     std::string reason;
 
-    bool operator==(const NetworkdAnswer&) const = default;
+    bool operator==(const NetworkdResponse&) const = default;
 };
 
 /// Asks the networkd of this machine over the system bus. Starts nothing, and answers
 /// at the deadline at the latest, whatever the bus and networkd do. Never throws apart
 /// from std::bad_alloc.
-[[nodiscard]] NetworkdAnswer askNetworkd(std::chrono::steady_clock::time_point deadline);
+[[nodiscard]] NetworkdResponse askNetworkd(std::chrono::steady_clock::time_point deadline);
 
 /// Adds to the facts what the state files do not tell: the servers of DHCPv6 leases,
 /// which networkd alone of all clients knows by address, and the addresses that it was

@@ -1,6 +1,5 @@
 #include "clients/Processes.h"
 
-#include <dirent.h>
 #include <fcntl.h>
 #include <unistd.h>
 
@@ -9,20 +8,20 @@
 #include <cerrno>
 #include <cstddef>
 #include <cstdint>
-#include <memory>
 #include <optional>
 #include <span>
 #include <string>
 #include <string_view>
-#include <system_error>
 #include <vector>
 
 #include "clients/Dhclient.h"
 #include "clients/Dhcp6c.h"
 #include "clients/Dhcpcd.h"
 #include "clients/Udhcpc.h"
+#include "formats/Directory.h"
 #include "formats/Files.h"
 #include "formats/Numbers.h"
+#include "formats/SystemErrors.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace ZR::Live {
@@ -53,13 +52,6 @@ constexpr std::array<KnownManager, 4> knownManagers{{
     {"wickedd-dhcp4", Client::Wicked},
     {"connmand", Client::Connman},
 }};
-
-struct CloseDirectory {
-    void operator()(DIR* directory) const noexcept {
-        // Nothing was written through it that a failing close could lose.
-        static_cast<void>(::closedir(directory));
-    }
-};
 
 /// A path below /proc without an allocation: there are many processes.
 class ProcessPath {
@@ -187,9 +179,9 @@ void readClient(int proc, std::string_view process, const KnownClient& client,
     }
     const auto where = whereIs(proc, process, ownNamespace);
     if (where == ManagerProcess::Where::Unknown && (errno == EACCES || errno == EPERM)) {
-        facts.complaints.push_back("cannot tell the links of process " + std::string{process} +
-                                   " (" + std::string{nameOf(found->client)} +
-                                   "): " + std::generic_category().message(errno));
+        facts.diagnostics.push_back("cannot tell the links of process " + std::string{process} +
+                                    " (" + std::string{nameOf(found->client)} +
+                                    "): " + reasonOf(errno));
     }
     if (where == ManagerProcess::Where::Here) {
         found->pid = numberOf(process);
@@ -200,22 +192,17 @@ void readClient(int proc, std::string_view process, const KnownClient& client,
 }  // namespace
 
 void readProcesses(const Roots& roots, ClientFacts& facts) {
-    const std::unique_ptr<DIR, CloseDirectory> directory{::opendir(roots.proc.c_str())};
+    Directory directory{roots.proc};
     if (!directory) {
-        facts.complaints.push_back(unreadable(roots.proc, errno));
+        facts.diagnostics.push_back(unreadable(roots.proc, errno));
         return;
     }
-    const int proc = ::dirfd(directory.get());
+    const int proc = directory.descriptor();
     // Of this thread: namespaces belong to threads, not to processes.
     const std::string ownNamespace = readNamespace(proc, "thread-self/ns/net");
     const std::vector<std::int32_t> ofKernel = kernelThreads(proc);
-    for (;;) {
-        errno = 0;
-        const dirent* const entry = ::readdir(directory.get());
-        if (entry == nullptr) {
-            break;
-        }
-        const std::string_view process{&entry->d_name[0]};
+    for (std::string_view process = directory.next(); !process.empty();
+         process = directory.next()) {
         if (process.front() < '1' || process.front() > '9' ||
             std::binary_search(ofKernel.begin(), ofKernel.end(), numberOf(process))) {
             continue;
@@ -240,7 +227,7 @@ void readProcesses(const Roots& roots, ClientFacts& facts) {
         }
     }
     if (errno != 0) {
-        facts.complaints.push_back(unreadable(roots.proc, errno));
+        facts.diagnostics.push_back(unreadable(roots.proc, errno));
     }
 }
 

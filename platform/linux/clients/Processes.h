@@ -1,6 +1,6 @@
 #pragma once
 
-#include "clients/Lease.h"
+#include "clients/ClientFacts.h"
 #include "formats/Roots.h"
 
 namespace ZR::Live {

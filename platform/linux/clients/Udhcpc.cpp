@@ -1,6 +1,5 @@
 #include "clients/Udhcpc.h"
 
-#include <sys/socket.h>
 #include <sys/stat.h>
 
 #include <algorithm>
@@ -9,17 +8,18 @@
 #include <string>
 #include <utility>
 
-#include "formats/AddressText.h"
 #include "formats/Files.h"
 #include "formats/Numbers.h"
 #include "formats/OptionWalk.h"
 #include "formats/ShellAssignments.h"
-#include "kernel/Link.h"
 
 namespace ZR::Live {
 namespace {
 
-constexpr std::string_view defaultInterface = "eth0";
+InterfaceName defaultInterface() {
+    return *InterfaceName::from("eth0");
+}
+
 constexpr std::string_view stateSuffix = ".state";
 
 // -a takes its number in the same argument only, where it does no harm as letters.
@@ -28,7 +28,7 @@ constexpr std::array<std::string_view, 12> longWithValue{
     "interface", "client-port",    "script",  "pidfile", "retries",     "timeout",
     "tryagain",  "request-option", "request", "fqdn",    "vendorclass", "hostname"};
 
-bool runsOn(const ClientFacts& facts, std::string_view interface) {
+bool runsOn(const ClientFacts& facts, const InterfaceName& interface) {
     return std::any_of(
         facts.processes.begin(), facts.processes.end(), [&](const ClientProcess& process) {
             return process.client == Client::Udhcpc && !process.ipv6 && process.serves(interface);
@@ -51,14 +51,14 @@ std::optional<ClientProcess> parseUdhcpcArguments(std::span<const std::string_vi
         return std::nullopt;
     }
     ClientProcess process{.client = Client::Udhcpc,
-                          .interfaces = {std::string{defaultInterface}},
+                          .interfaces = {defaultInterface()},
                           .leaseFile = {},
                           .ipv6 = name == "udhcpc6"};
     OptionWalk walk{arguments.subspan(1), lettersWithValue, longWithValue};
     for (CommandOption option; walk.next(option);) {
-        if ((option.letter == 'i' || option.longName == "interface") &&
-            isInterfaceName(option.value)) {
-            process.interfaces.front() = option.value;
+        const auto interface = InterfaceName::from(option.value);
+        if ((option.letter == 'i' || option.longName == "interface") && interface) {
+            process.interfaces.front() = *interface;
         }
     }
     return process;
@@ -66,32 +66,32 @@ std::optional<ClientProcess> parseUdhcpcArguments(std::span<const std::string_vi
 
 void readUdhcpc(const Roots& roots, ClientFacts& facts) {
     const std::string directory = roots.path(udhcpcStateDirectory);
-    for (const std::string& name : listOptionalDirectory(directory, facts.complaints)) {
-        std::string_view interface { name };
-        if (!interface.starts_with(udhcpcStatePrefix) || !interface.ends_with(stateSuffix) ||
-            interface.size() < udhcpcStatePrefix.size() + stateSuffix.size()) {
+    for (const std::string& name : listOptionalDirectory(directory, facts.diagnostics)) {
+        std::string_view stem{name};
+        if (!stem.starts_with(udhcpcStatePrefix) || !stem.ends_with(stateSuffix) ||
+            stem.size() < udhcpcStatePrefix.size() + stateSuffix.size()) {
             continue;
         }
-        interface.remove_prefix(udhcpcStatePrefix.size());
-        interface.remove_suffix(stateSuffix.size());
+        stem.remove_prefix(udhcpcStatePrefix.size());
+        stem.remove_suffix(stateSuffix.size());
+        const auto interface = InterfaceName::from(stem);
         std::string path = pathIn(directory, name);
         struct stat status {};
-        if (!isInterfaceName(interface) || ::stat(path.c_str(), &status) != 0) {
+        if (!interface || ::stat(path.c_str(), &status) != 0) {
             continue;
         }
-        const auto text = readOptionalFile(path, facts.complaints);
+        const auto text = readOptionalFile(path, facts.diagnostics);
         const auto variables = parseShellAssignments(text.value_or(""));
         const auto lifetime = parseNumber<std::uint32_t>(lastValue(variables, "lease"));
-        std::string address = canonicalIPv4(lastValue(variables, "ip"));
-        if (address.empty() || !lifetime) {
+        const auto address = IpAddress::ipv4FromText(lastValue(variables, "ip"));
+        if (!address || !lifetime) {
             continue;
         }
         facts.leases.push_back({.client = Client::Udhcpc,
-                                .interfaceName = std::string{interface},
-                                .family = AF_INET,
-                                .address = std::move(address),
-                                .server = canonicalIPv4(lastValue(variables, "serverid")),
-                                .clientAlive = runsOn(facts, interface),
+                                .interfaceName = interface,
+                                .address = *address,
+                                .server = IpAddress::ipv4FromText(lastValue(variables, "serverid")),
+                                .clientAlive = runsOn(facts, *interface),
                                 .expires = *lifetime == UINT32_MAX
                                                ? Lease::never
                                                : status.st_mtim.tv_sec + std::int64_t{*lifetime},

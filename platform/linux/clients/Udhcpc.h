@@ -4,7 +4,7 @@
 #include <span>
 #include <string_view>
 
-#include "clients/Lease.h"
+#include "clients/ClientFacts.h"
 #include "formats/Roots.h"
 
 namespace ZR::Live {

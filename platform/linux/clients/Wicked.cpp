@@ -7,10 +7,9 @@
 #include <utility>
 #include <variant>
 
-#include "formats/AddressText.h"
 #include "formats/Files.h"
+#include "formats/InterfaceName.h"
 #include "formats/Numbers.h"
-#include "kernel/Link.h"
 #include "zrcommon/Strings.h"
 
 namespace ZR::Live {
@@ -112,16 +111,15 @@ class Builder {
 
     void takeDhcp(std::string_view name, std::string_view text) {
         if (name == "server-id" && lease_.family == AF_INET) {  // of DHCPv6 it is a DUID
-            lease_.server = canonicalIPv4(text);
+            lease_.server = IpAddress::ipv4FromText(text);
         } else if (name == "server-address" && lease_.family == AF_INET6) {
             const std::string_view address = text.substr(0, text.find('%'));
-            lease_.server = canonicalAddress(AF_INET6, address).value_or("");
+            lease_.server = IpAddress::fromText(AF_INET6, address);
         } else if (name == "lease-time") {
             leaseTime_ = parseNumber<std::uint32_t>(text);
         } else if (name == "address" && lease_.family == AF_INET) {
-            if (std::string address = canonicalIPv4(text); !address.empty()) {
-                lease_.addresses = {
-                    {.address = std::move(address), .acquired = {}, .lifetime = {}}};
+            if (const auto address = IpAddress::ipv4FromText(text)) {
+                lease_.addresses = {{.address = *address, .acquired = {}, .lifetime = {}}};
             }
         }
     }
@@ -131,10 +129,9 @@ class Builder {
             associationAcquired_ = parseNumber<std::int64_t>(text);
         } else if (name == "address") {
             const std::string_view plain = text.substr(0, text.find('/'));
-            if (auto address = canonicalAddress(AF_INET6, plain)) {
-                lease_.addresses.push_back({.address = *std::move(address),
-                                            .acquired = associationAcquired_,
-                                            .lifetime = {}});
+            if (const auto address = IpAddress::fromText(AF_INET6, plain)) {
+                lease_.addresses.push_back(
+                    {.address = *address, .acquired = associationAcquired_, .lifetime = {}});
             }
         } else if (name.starts_with("valid-") && !lease_.addresses.empty()) {
             lease_.addresses.back().lifetime = parseNumber<std::uint32_t>(text);
@@ -148,7 +145,7 @@ class Builder {
 };
 
 /// lease-INTERFACE-dhcp-ipv4.xml, or -ipv6.xml.
-std::optional<std::string> interfaceOf(std::string_view name) {
+std::optional<InterfaceName> interfaceOf(std::string_view name) {
     constexpr std::string_view suffix = "-dhcp-ipv4.xml";
     if (!name.starts_with(wickedLeasePrefix) ||
         (!name.ends_with(suffix) && !name.ends_with("-dhcp-ipv6.xml")) ||
@@ -157,7 +154,7 @@ std::optional<std::string> interfaceOf(std::string_view name) {
     }
     name.remove_prefix(wickedLeasePrefix.size());
     name.remove_suffix(suffix.size());
-    return isInterfaceName(name) ? std::optional{std::string{name}} : std::nullopt;
+    return InterfaceName::from(name);
 }
 
 std::optional<std::int64_t> end(const WickedAddress& address) {
@@ -171,17 +168,17 @@ std::optional<std::int64_t> end(const WickedAddress& address) {
     return *address.acquired + *address.lifetime;
 }
 
-void addLeases(WickedLease&& lease, const std::string& interface, const std::string& path,
+void addLeases(const WickedLease& lease, const InterfaceName& interface, const std::string& path,
                ClientFacts& facts) {
     if (lease.type != "dhcp" || lease.state != "granted" || lease.family == 0) {
         return;
     }
-    for (WickedAddress& address : lease.addresses) {
-        if (const auto expires = end(address)) {
+    for (const WickedAddress& address : lease.addresses) {
+        const auto expires = end(address);
+        if (expires && address.address.family() == lease.family) {
             facts.leases.push_back({.client = Client::Wicked,
                                     .interfaceName = interface,
-                                    .family = lease.family,
-                                    .address = std::move(address.address),
+                                    .address = address.address,
                                     .server = lease.server,
                                     .clientAlive = facts.runs(Client::Wicked),
                                     .expires = expires,
@@ -207,18 +204,18 @@ Parsed<WickedLease> parseWickedLease(std::string_view xml) {
 void readWicked(const Roots& roots, ClientFacts& facts) {
     for (const std::string_view place : wickedDirectories) {
         const std::string directory = roots.path(place);
-        for (const std::string& name : listOptionalDirectory(directory, facts.complaints)) {
+        for (const std::string& name : listOptionalDirectory(directory, facts.diagnostics)) {
             const auto interface = interfaceOf(name);
             const std::string path = pathIn(directory, name);
-            const auto text = interface ? readOptionalFile(path, facts.complaints) : std::nullopt;
+            const auto text = interface ? readOptionalFile(path, facts.diagnostics) : std::nullopt;
             if (!text) {
                 continue;
             }
             auto parsed = parseWickedLease(*text);
             if (const auto* const reason = std::get_if<std::string_view>(&parsed)) {
-                facts.complaints.push_back("cannot use " + path + ": " + std::string{*reason});
+                facts.diagnostics.push_back("cannot use " + path + ": " + std::string{*reason});
             } else {
-                addLeases(std::get<WickedLease>(std::move(parsed)), *interface, path, facts);
+                addLeases(std::get<WickedLease>(parsed), *interface, path, facts);
             }
         }
     }

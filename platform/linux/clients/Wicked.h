@@ -7,8 +7,9 @@
 #include <string_view>
 #include <vector>
 
-#include "clients/Lease.h"
-#include "formats/DhcpPacket.h"
+#include "clients/ClientFacts.h"
+#include "formats/IpAddress.h"
+#include "formats/Parsed.h"
 #include "formats/Roots.h"
 
 namespace ZR::Live {
@@ -20,7 +21,7 @@ inline constexpr std::string_view wickedLeasePrefix = "lease-";
 
 /// One address of a wicked lease.
 struct WickedAddress {
-    std::string address;                    ///< canonical text
+    IpAddress address;
     std::optional<std::int64_t> acquired;   ///< epoch seconds
     std::optional<std::uint32_t> lifetime;  ///< seconds; UINT32_MAX: for ever
 
@@ -29,10 +30,10 @@ struct WickedAddress {
 
 /// A lease file of wicked.
 struct WickedLease {
-    std::uint8_t family = 0;  ///< AF_INET or AF_INET6; 0 for neither
-    std::string type;         ///< "dhcp", "static", "auto", ...
-    std::string state;        ///< "granted" while it holds
-    std::string server;       ///< canonical text; of DHCPv6 the sender of the messages
+    std::uint8_t family = 0;          ///< AF_INET or AF_INET6; 0 for neither
+    std::string type;                 ///< "dhcp", "static", "auto", ...
+    std::string state;                ///< "granted" while it holds
+    std::optional<IpAddress> server;  ///< of DHCPv6 the sender of the messages
     std::vector<WickedAddress> addresses;
 
     bool operator==(const WickedLease&) const = default;

@@ -4,10 +4,9 @@
 #include <cstddef>
 #include <utility>
 
-#include "formats/AddressText.h"
 #include "formats/Files.h"
+#include "formats/InterfaceName.h"
 #include "formats/ShellAssignments.h"
-#include "kernel/Link.h"
 
 namespace ZR::Live {
 namespace {
@@ -75,8 +74,8 @@ IfcfgFile parseIfcfg(std::string_view text) {
     file.dhcp6 = dhcp6 == "yes" || dhcp6 == "true" || dhcp6 == "1";
     for (const ShellAssignment& assignment : assignments) {
         if (isAddressName(assignment.name)) {
-            if (std::string address = canonicalIPv4(assignment.value); !address.empty()) {
-                file.addresses.push_back(std::move(address));
+            if (const auto address = IpAddress::ipv4FromText(assignment.value)) {
+                file.addresses.push_back(*address);
             }
         }
     }
@@ -92,12 +91,12 @@ bool isIfcfgName(std::string_view name) noexcept {
 void readIfcfg(const Roots& roots, ClientFacts& facts) {
     for (const std::string_view place : ifcfgDirectories) {
         const std::string directory = roots.path(place);
-        for (const std::string& name : listOptionalDirectory(directory, facts.complaints)) {
+        for (const std::string& name : listOptionalDirectory(directory, facts.diagnostics)) {
             if (!isIfcfgName(name)) {
                 continue;
             }
             std::string path = pathIn(directory, name);
-            const auto text = readOptionalFile(path, facts.complaints);
+            const auto text = readOptionalFile(path, facts.diagnostics);
             if (!text) {
                 continue;
             }
@@ -106,12 +105,12 @@ void readIfcfg(const Roots& roots, ClientFacts& facts) {
             if (file.device.empty() && file.hardware.empty()) {
                 file.device = name.substr(ifcfgPrefix.size());
             }
-            if (!isInterfaceName(file.device)) {
+            const auto device = InterfaceName::from(file.device);
+            if (!device) {
                 continue;
             }
-            std::string device = file.device;
             LinkConfiguration configuration = configurationOf(std::move(file));
-            configuration.interfaceName = std::move(device);
+            configuration.interfaceName = device;
             configuration.origin = std::move(path);
             facts.configurations.push_back(std::move(configuration));
         }

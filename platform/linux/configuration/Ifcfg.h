@@ -5,7 +5,8 @@
 #include <string_view>
 #include <vector>
 
-#include "clients/Lease.h"
+#include "clients/ClientFacts.h"
+#include "formats/IpAddress.h"
 #include "formats/Roots.h"
 
 namespace ZR::Live {
@@ -17,11 +18,11 @@ inline constexpr std::string_view ifcfgPrefix = "ifcfg-";
 
 /// The settings of an ifcfg file that tell where addresses come from.
 struct IfcfgFile {
-    std::string device;                  ///< empty when the file does not name it
-    std::string hardware;                ///< the device's address, where it is named by that
-    std::string bootProtocol;            ///< in small letters; empty for none
-    std::vector<std::string> addresses;  ///< IPv4, canonical text
-    bool dhcp6 = false;                  ///< DHCPV6C
+    std::string device;                ///< empty when the file does not name it
+    std::string hardware;              ///< the device's address, where it is named by that
+    std::string bootProtocol;          ///< in small letters; empty for none
+    std::vector<IpAddress> addresses;  ///< of IPv4
+    bool dhcp6 = false;                ///< DHCPV6C
 
     bool operator==(const IfcfgFile&) const = default;
 };

@@ -7,9 +7,7 @@
 #include <cstddef>
 #include <map>
 
-#include "formats/AddressText.h"
 #include "formats/Files.h"
-#include "kernel/Link.h"
 #include "zrcommon/Strings.h"
 
 namespace ZR::Live {
@@ -46,8 +44,8 @@ std::string takeLine(std::string_view& text) {
 
 void takeOption(std::string_view keyword, std::string_view rest, IfaceStanza& stanza) {
     if (keyword == "address" && stanza.family == "inet") {
-        if (std::string address = canonicalIPv4(trim(rest)); !address.empty()) {
-            stanza.addresses.push_back(std::move(address));
+        if (const auto address = IpAddress::ipv4FromText(trim(rest))) {
+            stanza.addresses.push_back(*address);
         }
     } else if (keyword == "dhcp") {
         stanza.dhcp = trim(rest) == "1" || trim(rest) == "yes";
@@ -73,7 +71,7 @@ class Reader {
     Reader(const Roots& roots, ClientFacts& facts) : roots_(roots), facts_(facts) {}
 
     void readFile(const std::string& path, int depth) {
-        const auto text = readOptionalFile(roots_.path(path), facts_.complaints);
+        const auto text = readOptionalFile(roots_.path(path), facts_.diagnostics);
         if (!text || depth == deepest) {
             return;
         }
@@ -103,7 +101,7 @@ class Reader {
         const std::string place = roots_.path(directory);
         facts_.places.push_back(
             {.directory = place, .namePrefix = pattern.substr(0, pattern.find_first_of("*?[\\"))});
-        for (const std::string& name : listOptionalDirectory(place, facts_.complaints)) {
+        for (const std::string& name : listOptionalDirectory(place, facts_.diagnostics)) {
             if (::fnmatch(pattern.c_str(), name.c_str(), FNM_PERIOD) == 0) {
                 readFile(pathIn(directory, name), depth + 1);
             }
@@ -179,15 +177,16 @@ InterfacesFile parseInterfaces(std::string_view text) {
     return file;
 }
 
-std::vector<std::pair<std::string, std::string>> parseIfstate(std::string_view text) {
-    std::vector<std::pair<std::string, std::string>> up;
+std::vector<std::pair<InterfaceName, std::string>> parseIfstate(std::string_view text) {
+    std::vector<std::pair<InterfaceName, std::string>> up;
     while (!text.empty()) {
         const std::size_t end = std::min(text.find('\n'), text.size());
         const std::string_view line = trim(text.substr(0, end));
         text.remove_prefix(std::min(end + 1, text.size()));
         const std::size_t equals = line.find('=');
-        if (equals != std::string_view::npos && isInterfaceName(line.substr(0, equals))) {
-            up.emplace_back(line.substr(0, equals), line.substr(equals + 1));
+        const auto name = InterfaceName::from(line.substr(0, equals));
+        if (equals != std::string_view::npos && name) {
+            up.emplace_back(*name, line.substr(equals + 1));
         }
     }
     return up;
@@ -197,10 +196,10 @@ void readIfupdown(const Roots& roots, ClientFacts& facts) {
     Reader reader{roots, facts};
     reader.readFile(std::string{ifupdownDirectory} + '/' + std::string{ifupdownFile}, 0);
     const auto state = readOptionalFile(
-        pathIn(roots.path(ifupdownStateDirectory), ifupdownStateFile), facts.complaints);
+        pathIn(roots.path(ifupdownStateDirectory), ifupdownStateFile), facts.diagnostics);
     const auto up = parseIfstate(state.value_or(""));
-    std::map<std::string, LinkConfiguration> byInterface;
-    const auto applyTo = [&](const std::string& interface, const Found& found) {
+    std::map<InterfaceName, LinkConfiguration> byInterface;
+    const auto applyTo = [&](const InterfaceName& interface, const Found& found) {
         const LinkConfiguration empty{.client = Client::Ifupdown,
                                       .interfaceName = interface,
                                       .dhcp4 = {},
@@ -217,8 +216,9 @@ void readIfupdown(const Roots& roots, ClientFacts& facts) {
                 applyTo(physical, found);
             }
         }
-        if (!mapped && isInterfaceName(found.stanza.name)) {
-            applyTo(found.stanza.name, found);
+        const auto name = InterfaceName::from(found.stanza.name);
+        if (!mapped && name) {
+            applyTo(*name, found);
         }
     }
     for (auto& [interface, configuration] : byInterface) {

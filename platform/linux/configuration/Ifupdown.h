@@ -5,7 +5,9 @@
 #include <utility>
 #include <vector>
 
-#include "clients/Lease.h"
+#include "clients/ClientFacts.h"
+#include "formats/InterfaceName.h"
+#include "formats/IpAddress.h"
 #include "formats/Roots.h"
 
 namespace ZR::Live {
@@ -17,11 +19,11 @@ inline constexpr std::string_view ifupdownStateFile = "ifstate";
 
 /// One stanza "iface NAME FAMILY METHOD" of interfaces(5).
 struct IfaceStanza {
-    std::string name;                    ///< a logical name; most often that of the interface
-    std::string family;                  ///< "inet", "inet6", ...
-    std::string method;                  ///< "dhcp", "static", "manual", "bootp", ...
-    std::vector<std::string> addresses;  ///< IPv4, canonical text
-    bool dhcp = false;                   ///< the option of inet6 auto: DHCPv6 as well
+    std::string name;                  ///< a logical name; most often that of the interface
+    std::string family;                ///< "inet", "inet6", ...
+    std::string method;                ///< "dhcp", "static", "manual", "bootp", ...
+    std::vector<IpAddress> addresses;  ///< of IPv4
+    bool dhcp = false;                 ///< the option of inet6 auto: DHCPv6 as well
 
     bool operator==(const IfaceStanza&) const = default;
 };
@@ -37,7 +39,8 @@ struct InterfacesFile {
 [[nodiscard]] InterfacesFile parseInterfaces(std::string_view text);
 
 /// The lines PHYSICAL=LOGICAL of the interfaces that are up.
-[[nodiscard]] std::vector<std::pair<std::string, std::string>> parseIfstate(std::string_view text);
+[[nodiscard]] std::vector<std::pair<InterfaceName, std::string>> parseIfstate(
+    std::string_view text);
 
 /// Adds the configuration of each interface.
 void readIfupdown(const Roots& roots, ClientFacts& facts);

@@ -4,7 +4,6 @@
 #include <string>
 #include <utility>
 
-#include "formats/AddressText.h"
 #include "formats/Files.h"
 #include "zrcommon/Strings.h"
 
@@ -16,7 +15,7 @@ constexpr std::string_view serverKey = "bootserver ";
 
 }  // namespace
 
-std::optional<BootAnswer> parseKernelBoot(std::string_view text) {
+std::optional<BootResponse> parseKernelBoot(std::string_view text) {
     // The first line is "#DHCP", or "#PROTO: DHCP" of other versions.
     if (!text.starts_with('#')) {
         return std::nullopt;
@@ -29,22 +28,22 @@ std::optional<BootAnswer> parseKernelBoot(std::string_view text) {
     if (protocol != "DHCP" && protocol != "BOOTP") {
         return std::nullopt;
     }
-    BootAnswer answer{.bootp = protocol == "BOOTP", .server = {}, .origin = {}};
+    BootResponse response{.bootp = protocol == "BOOTP", .server = {}, .origin = {}};
     while (!text.empty()) {
         const std::size_t end = std::min(text.find('\n'), text.size());
         const std::string_view line = text.substr(0, end);
         if (line.starts_with(serverKey)) {
-            answer.server = canonicalIPv4(trim(line.substr(serverKey.size())));
+            response.server = IpAddress::ipv4FromText(trim(line.substr(serverKey.size())));
         }
         text.remove_prefix(std::min(end + 1, text.size()));
     }
-    return answer;
+    return response;
 }
 
 void readKernelBoot(const Roots& roots, ClientFacts& facts) {
     // Of this thread: namespaces belong to threads, not to processes.
     std::string path = roots.proc + "/thread-self/net/pnp";
-    const auto text = readOptionalFile(path, facts.complaints);
+    const auto text = readOptionalFile(path, facts.diagnostics);
     facts.boot = parseKernelBoot(text.value_or(""));
     if (facts.boot) {
         facts.boot->origin = std::move(path);

@@ -2,7 +2,7 @@
 
 #include <string_view>
 
-#include "clients/Lease.h"
+#include "clients/ClientFacts.h"
 #include "formats/Roots.h"
 
 namespace ZR::Live {

@@ -5,9 +5,6 @@
 #include <algorithm>
 #include <array>
 #include <tuple>
-#include <utility>
-
-#include "formats/AddressText.h"
 
 namespace ZR::Live {
 namespace {
@@ -142,9 +139,9 @@ bool gatherAddresses(Bytes association, std::size_t header, Dhcp6Reply& reply) {
             return false;
         }
         const std::uint32_t lifetime = number(value.subspan(validLifetimeAt, 4));
-        auto address = addressText(AF_INET6, value.first(longAddressSize));
+        const auto address = IpAddress::fromBytes(AF_INET6, value.first(longAddressSize));
         if (address && lifetime != 0) {  // 0 takes the address back
-            reply.addresses.push_back({.address = *std::move(address), .validLifetime = lifetime});
+            reply.addresses.push_back({.address = *address, .validLifetime = lifetime});
         }
         return true;
     });
@@ -186,11 +183,11 @@ Parsed<DhcpReply> parseDhcpReply(Bytes message) {
         }
     }
     DhcpReply reply;
-    const Bytes yours = message.subspan(yourAddressAt, addressSize);
-    if (number(yours) != 0) {
-        reply.address = addressText(AF_INET, yours).value_or("");
+    const auto yours = IpAddress::fromBytes(AF_INET, message.subspan(yourAddressAt, addressSize));
+    if (yours && !yours->isUnspecified()) {
+        reply.address = yours;
     }
-    reply.server = addressText(AF_INET, options.server).value_or("");
+    reply.server = IpAddress::fromBytes(AF_INET, options.server);
     reply.bootp = options.messageType.empty();
     if (options.leaseTime.size() == sizeof(std::uint32_t)) {
         reply.leaseTime = number(options.leaseTime);

@@ -4,21 +4,17 @@
 #include <cstdint>
 #include <optional>
 #include <span>
-#include <string>
-#include <string_view>
-#include <variant>
 #include <vector>
+
+#include "formats/IpAddress.h"
+#include "formats/Parsed.h"
 
 namespace ZR::Live {
 
-/// Facts, or the reason why there are none.
-template <typename Facts>
-using Parsed = std::variant<Facts, std::string_view>;
-
 /// What a server's BOOTP or DHCP reply says (RFC 951, RFC 2131).
 struct DhcpReply {
-    std::string address;                     ///< "your" address, canonical text; empty for none
-    std::string server;                      ///< option 54, canonical text; empty for none
+    std::optional<IpAddress> address;        ///< "your" address
+    std::optional<IpAddress> server;         ///< option 54
     bool bootp = false;                      ///< no DHCP message type (option 53)
     std::optional<std::uint32_t> leaseTime;  ///< option 51, seconds; UINT32_MAX: for ever
 
@@ -32,7 +28,7 @@ struct DhcpReply {
 
 /// One address of a DHCPv6 reply.
 struct Dhcp6Address {
-    std::string address;              ///< canonical text
+    IpAddress address;
     std::uint32_t validLifetime = 0;  ///< seconds; UINT32_MAX: for ever
 
     bool operator==(const Dhcp6Address&) const = default;

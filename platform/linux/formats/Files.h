@@ -8,14 +8,14 @@
 namespace ZR::Live {
 
 /// The content of a file that need not exist. That it cannot be read although it
-/// exists is another thing, and goes to the complaints.
+/// exists is another thing, and goes to the diagnostics.
 [[nodiscard]] std::optional<std::string> readOptionalFile(const std::string& path,
-                                                          std::vector<std::string>& complaints);
+                                                          std::vector<std::string>& diagnostics);
 
 /// The names in a directory that need not exist, sorted, without those that begin
 /// with a point: such are half-written files waiting to be renamed.
 [[nodiscard]] std::vector<std::string> listOptionalDirectory(const std::string& path,
-                                                             std::vector<std::string>& complaints);
+                                                             std::vector<std::string>& diagnostics);
 
 /// DIRECTORY/NAME
 [[nodiscard]] std::string pathIn(const std::string& directory, std::string_view name);

@@ -2,9 +2,10 @@
 
 #include <array>
 #include <cerrno>
-#include <system_error>
 #include <utility>
 #include <variant>
+
+#include "formats/SystemErrors.h"
 
 namespace ZR::Live {
 namespace {
@@ -17,10 +18,6 @@ constexpr std::array<std::uint8_t, 12> channels{1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 1
 // More than all questions together: what comes beyond is heard next time, so that
 // nobody's flood keeps a caller here.
 constexpr int longestHearing = 64;
-
-std::string reasonOf(int error) {
-    return std::generic_category().message(error);
-}
 
 }  // namespace
 
@@ -99,7 +96,7 @@ void IpmiConversation::ask(Topic topic, std::uint8_t channel) {
     open_.emplace(id, Question{topic, channel});
 }
 
-void IpmiConversation::hear(const Question& question, const IpmiAnswer& answer) {
+void IpmiConversation::hear(const Question& question, const IpmiResponse& answer) {
     switch (question.topic) {
         case Topic::Address:
             address_ = decodeLanAddress(answer);
@@ -155,7 +152,7 @@ void IpmiConversation::conclude(std::uint8_t channel) {
         } else if (refusal->passing()) {
             fail(subject + (": " + refusal->reason));
         } else if (!refusal->unsupported()) {
-            complaints_.push_back(subject + (": " + refusal->reason));
+            diagnostics_.push_back(subject + (": " + refusal->reason));
         }
     };
     take(addressSource_, lan.addressSource, "address source");
@@ -177,7 +174,7 @@ void IpmiConversation::checkPatience(Time now) {
 
 void IpmiConversation::fail(const std::string& reason) {
     state_ = State::Failed;
-    complaints_.assign(1, reason);
+    diagnostics_.assign(1, reason);
 }
 
 }  // namespace ZR::Live

@@ -43,8 +43,8 @@ class IpmiConversation {
     [[nodiscard]] const std::optional<LanChannel>& lan() const noexcept { return lan_; }
 
     /// Once failed: why. Once finished: what was not answered as it should.
-    [[nodiscard]] const std::vector<std::string>& complaints() const noexcept {
-        return complaints_;
+    [[nodiscard]] const std::vector<std::string>& diagnostics() const noexcept {
+        return diagnostics_;
     }
 
   private:
@@ -57,7 +57,7 @@ class IpmiConversation {
 
     void begin(Round round, Time now);
     void ask(Topic topic, std::uint8_t channel);
-    void hear(const Question& question, const IpmiAnswer& answer);
+    void hear(const Question& question, const IpmiResponse& answer);
     void endRound(Time now);
     void conclude(std::uint8_t channel);
     void checkPatience(Time now);
@@ -74,10 +74,10 @@ class IpmiConversation {
     std::uint8_t channel_;                          // that is asked about, or was expected
     std::map<std::uint8_t, std::uint8_t> lanChannels_;  // by the number asked for
     std::optional<IpmiRefusal> passing_;  // why the channels that were heard may not be all
-    std::optional<IpmiDecoded<std::string>> address_;
+    std::optional<IpmiDecoded<std::optional<IpAddress>>> address_;
     std::optional<IpmiDecoded<std::uint8_t>> addressSource_;
     std::optional<LanChannel> lan_;
-    std::vector<std::string> complaints_;
+    std::vector<std::string> diagnostics_;
 };
 
 }  // namespace ZR::Live

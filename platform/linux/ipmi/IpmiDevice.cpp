@@ -10,6 +10,7 @@
 #include <utility>
 #include <vector>
 
+#include "formats/SystemErrors.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace ZR::Live {
@@ -29,8 +30,8 @@ int control(int fd, unsigned long request, Argument& argument) {
 }
 
 // ENXIO and ENODEV: a name of the device without a driver behind it.
-bool isAbsent(int error) {
-    return error == ENOENT || error == ENOTDIR || error == ENXIO || error == ENODEV;
+bool tellsOfNoDevice(int error) {
+    return isAbsent(error) || error == ENXIO || error == ENODEV;
 }
 
 class Device final : public IpmiTransport {
@@ -44,7 +45,7 @@ class Device final : public IpmiTransport {
             if (fd_) {
                 return 0;
             }
-            if (!isAbsent(errno)) {
+            if (!tellsOfNoDevice(errno)) {
                 return errno;
             }
         }

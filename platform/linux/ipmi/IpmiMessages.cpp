@@ -6,8 +6,6 @@
 #include <array>
 #include <cstddef>
 
-#include "formats/AddressText.h"
-
 namespace ZR::Live {
 namespace {
 
@@ -33,7 +31,7 @@ std::string hexadecimal(std::uint8_t number) {
 }
 
 /// The bytes behind the completion code.
-IpmiDecoded<std::span<const std::uint8_t>> payload(const IpmiAnswer& answer, std::uint8_t request,
+IpmiDecoded<std::span<const std::uint8_t>> payload(const IpmiResponse& answer, std::uint8_t request,
                                                    std::uint8_t command, std::size_t size) {
     if (answer.netFn != request + 1 || answer.command != command) {
         return IpmiRefusal{std::nullopt, "the answer is one to another command"};
@@ -54,7 +52,7 @@ IpmiDecoded<std::span<const std::uint8_t>> payload(const IpmiAnswer& answer, std
 
 /// The value of a parameter: what lies behind its revision, whose number does not
 /// matter as every revision so far can be read as the first.
-IpmiDecoded<std::span<const std::uint8_t>> parameter(const IpmiAnswer& answer, std::size_t size) {
+IpmiDecoded<std::span<const std::uint8_t>> parameter(const IpmiResponse& answer, std::size_t size) {
     auto found = payload(answer, transportRequest, lanParametersCommand, 1 + size);
     if (auto* const bytes = std::get_if<std::span<const std::uint8_t>>(&found)) {
         *bytes = bytes->subspan(1, size);
@@ -80,7 +78,7 @@ IpmiRequest getLanAddressSource(std::uint8_t channel) {
     return getLanParameter(channel, addressSourceParameter);
 }
 
-IpmiDecoded<ChannelInfo> decodeChannelInfo(const IpmiAnswer& answer) {
+IpmiDecoded<ChannelInfo> decodeChannelInfo(const IpmiResponse& answer) {
     auto found = payload(answer, appRequest, channelInfoCommand, 2);
     if (auto* const refusal = std::get_if<IpmiRefusal>(&found)) {
         return std::move(*refusal);
@@ -90,19 +88,20 @@ IpmiDecoded<ChannelInfo> decodeChannelInfo(const IpmiAnswer& answer) {
                        .medium = static_cast<std::uint8_t>(bytes[1] & 0x7FU)};
 }
 
-IpmiDecoded<std::string> decodeLanAddress(const IpmiAnswer& answer) {
+IpmiDecoded<std::optional<IpAddress>> decodeLanAddress(const IpmiResponse& answer) {
     auto found = parameter(answer, 4);
     if (auto* const refusal = std::get_if<IpmiRefusal>(&found)) {
         return std::move(*refusal);
     }
     const auto bytes = std::get<std::span<const std::uint8_t>>(found);
-    if (std::all_of(bytes.begin(), bytes.end(), [](std::uint8_t byte) { return byte == 0; })) {
-        return std::string{};
+    auto address = IpAddress::fromBytes(AF_INET, std::as_bytes(bytes));
+    if (address && address->isUnspecified()) {
+        address.reset();
     }
-    return addressText(AF_INET, std::as_bytes(bytes)).value_or(std::string{});
+    return address;
 }
 
-IpmiDecoded<std::uint8_t> decodeLanAddressSource(const IpmiAnswer& answer) {
+IpmiDecoded<std::uint8_t> decodeLanAddressSource(const IpmiResponse& answer) {
     auto found = parameter(answer, 1);
     if (auto* const refusal = std::get_if<IpmiRefusal>(&found)) {
         return std::move(*refusal);

@@ -7,6 +7,8 @@
 #include <variant>
 #include <vector>
 
+#include "formats/IpAddress.h"
+
 namespace ZR::Live {
 
 /// One command to a service processor (IPMI 2.0, chapter 5).
@@ -19,12 +21,12 @@ struct IpmiRequest {
 };
 
 /// What came back. The data begins with the completion code.
-struct IpmiAnswer {
+struct IpmiResponse {
     std::uint8_t netFn = 0;
     std::uint8_t command = 0;
     std::vector<std::uint8_t> data;
 
-    bool operator==(const IpmiAnswer&) const = default;
+    bool operator==(const IpmiResponse&) const = default;
 };
 
 /// Why an answer gives no facts.
@@ -65,14 +67,14 @@ struct ChannelInfo {
 // Any bytes give facts or a reason. What follows the expected bytes does not count:
 // later versions of the commands append to them.
 
-[[nodiscard]] IpmiDecoded<ChannelInfo> decodeChannelInfo(const IpmiAnswer& answer);
+[[nodiscard]] IpmiDecoded<ChannelInfo> decodeChannelInfo(const IpmiResponse& answer);
 
-/// Parameter 3 of Get LAN Configuration Parameters in text form; empty for 0.0.0.0,
-/// which stands for no address.
-[[nodiscard]] IpmiDecoded<std::string> decodeLanAddress(const IpmiAnswer& answer);
+/// Parameter 3 of Get LAN Configuration Parameters; nullopt for 0.0.0.0, which means that
+/// the channel has no address.
+[[nodiscard]] IpmiDecoded<std::optional<IpAddress>> decodeLanAddress(const IpmiResponse& answer);
 
 /// Parameter 4 of Get LAN Configuration Parameters: 0 unspecified, 1 static, 2 DHCP,
 /// 3 loaded by BIOS or system software, 4 another protocol; above 4 reserved.
-[[nodiscard]] IpmiDecoded<std::uint8_t> decodeLanAddressSource(const IpmiAnswer& answer);
+[[nodiscard]] IpmiDecoded<std::uint8_t> decodeLanAddressSource(const IpmiResponse& answer);
 
 }  // namespace ZR::Live

@@ -2,8 +2,9 @@
 
 #include <cerrno>
 #include <iterator>
-#include <system_error>
 #include <utility>
+
+#include "formats/SystemErrors.h"
 
 namespace ZR::Live {
 
@@ -15,10 +16,10 @@ bool IpmiReader::changed() {
     return known_ != given_;
 }
 
-std::optional<ServiceProcessor> IpmiReader::read(std::vector<std::string>& complaints) {
+std::optional<ServiceProcessor> IpmiReader::read(std::vector<std::string>& diagnostics) {
     advance();
     given_ = known_;
-    complaints.insert(complaints.end(), known_.complaints.begin(), known_.complaints.end());
+    diagnostics.insert(diagnostics.end(), known_.diagnostics.begin(), known_.diagnostics.end());
     return known_.processor;
 }
 
@@ -44,7 +45,7 @@ void IpmiReader::begin(std::chrono::steady_clock::time_point now) {
         known_.processor.emplace();
     }
     if (error != 0) {
-        fail({"cannot open: " + std::generic_category().message(error)});
+        fail({"cannot open: " + reasonOf(error)});
         return;
     }
     // Where the channel was, it will be.
@@ -58,22 +59,22 @@ void IpmiReader::begin(std::chrono::steady_clock::time_point now) {
 
 void IpmiReader::settle() {
     if (conversation_->state() == IpmiConversation::State::Failed) {
-        fail(conversation_->complaints());
+        fail(conversation_->diagnostics());
     } else {
         failures_ = 0;
-        known_ = {.processor = ServiceProcessor{conversation_->lan()}, .complaints = {}};
-        for (const std::string& complaint : conversation_->complaints()) {
-            known_.complaints.push_back("service processor: " + complaint);
+        known_ = {.processor = ServiceProcessor{conversation_->lan()}, .diagnostics = {}};
+        for (const std::string& diagnostic : conversation_->diagnostics()) {
+            known_.diagnostics.push_back("service processor: " + diagnostic);
         }
     }
     conversation_.reset();
     transport_->close();
 }
 
-void IpmiReader::fail(std::vector<std::string> complaints) {
-    known_.complaints.clear();
-    for (std::string& complaint : complaints) {
-        known_.complaints.push_back("service processor: " + std::move(complaint));
+void IpmiReader::fail(std::vector<std::string> diagnostics) {
+    known_.diagnostics.clear();
+    for (std::string& diagnostic : diagnostics) {
+        known_.diagnostics.push_back("service processor: " + std::move(diagnostic));
     }
     if (++failures_ > toleratedFailures) {
         known_.processor->lan.reset();

@@ -42,12 +42,12 @@ class IpmiReader {
 
     /// What is known; nullopt when the machine has no service processor. Adds what
     /// stands in the way of knowing more.
-    [[nodiscard]] std::optional<ServiceProcessor> read(std::vector<std::string>& complaints);
+    [[nodiscard]] std::optional<ServiceProcessor> read(std::vector<std::string>& diagnostics);
 
   private:
     struct Knowledge {
         std::optional<ServiceProcessor> processor;
-        std::vector<std::string> complaints;
+        std::vector<std::string> diagnostics;
 
         bool operator==(const Knowledge&) const = default;
     };
@@ -55,7 +55,7 @@ class IpmiReader {
     void advance();
     void begin(std::chrono::steady_clock::time_point now);
     void settle();
-    void fail(std::vector<std::string> complaints);
+    void fail(std::vector<std::string> diagnostics);
 
     std::unique_ptr<IpmiTransport> transport_;
     Clock clock_;

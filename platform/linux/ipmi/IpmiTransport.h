@@ -8,7 +8,7 @@ namespace ZR::Live {
 struct IpmiReceived {
     int error = 0;  ///< errno; EAGAIN when nothing has come yet
     long id = 0;    ///< of the request that it answers; 0 for a message that answers none
-    IpmiAnswer answer;
+    IpmiResponse answer;
 };
 
 /// A way to a service processor. Nothing here ever waits for it, and requests may

@@ -3,13 +3,17 @@
 #include <array>
 #include <vector>
 
+#include "formats/InterfaceName.h"
+
 namespace ZR::Live {
 namespace {
 
 using NodeLexicon::AddressSource;
 using NodeLexicon::Properties;
 
-constexpr std::uint64_t interfaceNameMaxLength = 15;  // as of the kernel's links
+// The names by which the provider knows this computer.
+constexpr const char* description = "BMC";
+constexpr const char* name = "BMC:-1";
 constexpr std::uint8_t dhcp = 2;
 
 /// By IPMI's number (IPMI 2.0, table 23-4). There is none for BOOTP or link-local.
@@ -24,8 +28,8 @@ AddressSource sourceOf(const LanChannel& lan) {
 }  // namespace
 
 void addServiceProcessor(const ServiceProcessor& processor, SnapshotBuilder& tree) {
-    const auto computer = tree.add(Snapshot::none, "ComputerSystem", "BMC");
-    tree.property(Properties::Name, "BMC:-1");
+    const auto computer = tree.add(Snapshot::none, "ComputerSystem", description);
+    tree.property(Properties::Name, name);
     if (!processor.lan) {
         return;
     }
@@ -33,10 +37,11 @@ void addServiceProcessor(const ServiceProcessor& processor, SnapshotBuilder& tre
     const auto network = tree.add(computer, "Network", "Network");
     tree.add(network, "NetworkInterface", "Ethernet interface");
     tree.property(Properties::Name, "bmc-lan" + std::to_string(lan.channel), true);
-    tree.property(Properties::NameMaxLength, interfaceNameMaxLength);
+    tree.property(Properties::NameMaxLength,
+                  std::uint64_t{InterfaceName::maxLength});  // as of the kernel's links
     // IPMI does not tell the state of the link, which is thus left out.
-    if (!lan.address.empty()) {
-        tree.property(Properties::IPv4Address, lan.address);
+    if (lan.address) {
+        tree.property(Properties::IPv4Address, lan.address->text());
     }
     if (lan.addressSource) {
         tree.property(Properties::DHCPEnabled, *lan.addressSource == dhcp);

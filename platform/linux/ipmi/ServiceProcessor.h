@@ -2,8 +2,8 @@
 
 #include <cstdint>
 #include <optional>
-#include <string>
 
+#include "formats/IpAddress.h"
 #include "zrclient/Snapshot.h"
 
 namespace ZR::Live {
@@ -12,7 +12,7 @@ namespace ZR::Live {
 struct LanChannel {
     std::uint8_t channel = 0;
     std::optional<std::uint8_t> addressSource;  ///< IPMI's number; nullopt when not told
-    std::string address;                        ///< empty for none, or when not told
+    std::optional<IpAddress> address;           ///< nullopt for none, or when not told
 
     bool operator==(const LanChannel&) const = default;
 };

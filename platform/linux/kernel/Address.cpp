@@ -4,16 +4,9 @@
 #include <linux/netlink.h>
 #include <linux/rtnetlink.h>
 
-#include "formats/AddressText.h"
 #include "kernel/Attributes.h"
 
 namespace ZR::Live {
-namespace {
-
-// Headers of kernels before 5.18 lack it.
-constexpr std::uint16_t addressProtocol = 11;
-
-}  // namespace
 
 std::optional<Address> parseAddress(std::span<const std::byte> message) {
     const auto header = valueAt<nlmsghdr>(message);
@@ -26,11 +19,8 @@ std::optional<Address> parseAddress(std::span<const std::byte> message) {
     if (!info || info->ifa_index == 0) {
         return std::nullopt;
     }
-    Address address{.ifindex = info->ifa_index,
-                    .family = info->ifa_family,
-                    .text = {},
-                    .flags = info->ifa_flags,
-                    .scope = info->ifa_scope};
+    std::uint32_t flags = info->ifa_flags;
+    std::uint32_t validLifetime = Address::infinite;
     std::span<const std::byte> own;
     std::span<const std::byte> plain;
     AttributeWalk walk{body.subspan(sizeof(ifaddrmsg))};
@@ -43,28 +33,27 @@ std::optional<Address> parseAddress(std::span<const std::byte> message) {
                 plain = attribute.payload;
                 break;
             case IFA_FLAGS:  // all 32 of them, where the header has room for eight
-                address.flags = valueAt<std::uint32_t>(attribute.payload).value_or(address.flags);
+                flags = valueAt<std::uint32_t>(attribute.payload).value_or(flags);
                 break;
             case IFA_CACHEINFO:
                 if (const auto cache = valueAt<ifa_cacheinfo>(attribute.payload)) {
-                    address.validLifetime = cache->ifa_valid;
-                    address.preferredLifetime = cache->ifa_prefered;
+                    validLifetime = cache->ifa_valid;
                 }
-                break;
-            case addressProtocol:
-                address.protocol = valueAt<std::uint8_t>(attribute.payload).value_or(0);
                 break;
             default:
                 break;
         }
     }
     // On a point-to-point link IFA_ADDRESS is the peer; IPv6 often has nothing else.
-    auto text = addressText(address.family, own.empty() ? plain : own);
-    if (walk.malformed() || !text) {
+    const auto ip = IpAddress::fromBytes(info->ifa_family, own.empty() ? plain : own);
+    if (walk.malformed() || !ip) {
         return std::nullopt;
     }
-    address.text = *std::move(text);
-    return address;
+    return Address{.ifindex = info->ifa_index,
+                   .ip = *ip,
+                   .flags = flags,
+                   .scope = info->ifa_scope,
+                   .validLifetime = validLifetime};
 }
 
 }  // namespace ZR::Live

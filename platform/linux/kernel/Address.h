@@ -4,7 +4,8 @@
 #include <cstdint>
 #include <optional>
 #include <span>
-#include <string>
+
+#include "formats/IpAddress.h"
 
 namespace ZR::Live {
 
@@ -14,13 +15,10 @@ struct Address {
     static constexpr std::uint32_t infinite = UINT32_MAX;
 
     std::uint32_t ifindex = 0;
-    std::uint8_t family = 0;                     ///< AF_INET or AF_INET6
-    std::string text;                            ///< the link's own address, never its peer's
-    std::uint32_t flags = 0;                     ///< IFA_F_*
-    std::uint8_t scope = 0;                      ///< RT_SCOPE_*
-    std::uint32_t validLifetime = infinite;      ///< seconds left when it was read
-    std::uint32_t preferredLifetime = infinite;  ///< seconds left when it was read
-    std::uint8_t protocol = 0;                   ///< IFAPROT_*; 0 when nobody says who set it
+    IpAddress ip;                            ///< the link's own address, never its peer's
+    std::uint32_t flags = 0;                 ///< IFA_F_*
+    std::uint8_t scope = 0;                  ///< RT_SCOPE_*
+    std::uint32_t validLifetime = infinite;  ///< seconds left when it was read
 
     bool operator==(const Address&) const = default;
 };

@@ -14,8 +14,9 @@
 #include <cstddef>
 #include <cstring>
 #include <functional>
-#include <system_error>
 #include <utility>
+
+#include "formats/SystemErrors.h"
 
 namespace ZR::Live {
 namespace {
@@ -35,24 +36,16 @@ int addWatch(int fd, const std::string& directory, std::uint32_t events) {
     return ::inotify_add_watch(fd, directory.c_str(), events | IN_ONLYDIR | IN_MASK_ADD);
 }
 
-bool isAbsent(int error) {
-    return error == ENOENT || error == ENOTDIR;
-}
-
-std::string reasonOf(int error) {
-    return std::generic_category().message(error);
-}
-
 }  // namespace
 
 void ChangeMonitor::begin(const std::vector<WatchedPlace>& places,
-                          std::vector<std::string>& complaints) {
+                          std::vector<std::string>& diagnostics) {
     if (blind_) {
         rearm_ = true;
         blind_ = false;
     }
-    openSubscription(complaints);
-    openWatches(complaints);
+    openSubscription(diagnostics);
+    openWatches(diagnostics);
     if (subscription_) {
         drainSubscription();
     }
@@ -63,7 +56,7 @@ void ChangeMonitor::begin(const std::vector<WatchedPlace>& places,
     if (watches_) {
         if (rearm_ || places != places_) {
             rearm_ = true;  // until all is done
-            watchAll(places, complaints);
+            watchAll(places, diagnostics);
             rearm_ = false;
         }
     }
@@ -119,7 +112,7 @@ void ChangeMonitor::watchProcesses(std::span<const std::int32_t> pids) {
     processes_ = std::move(processes);
 }
 
-void ChangeMonitor::openSubscription(std::vector<std::string>& complaints) {
+void ChangeMonitor::openSubscription(std::vector<std::string>& diagnostics) {
     if (subscription_) {
         return;
     }
@@ -130,13 +123,13 @@ void ChangeMonitor::openSubscription(std::vector<std::string>& complaints) {
     address.nl_groups = RTMGRP_LINK | RTMGRP_IPV4_IFADDR | RTMGRP_IPV6_IFADDR;
     const auto* const generic = static_cast<const sockaddr*>(static_cast<const void*>(&address));
     if (!subscription_ || ::bind(subscription_.get(), generic, sizeof address) != 0) {
-        complaints.push_back("cannot subscribe to network changes: " + reasonOf(errno));
+        diagnostics.push_back("cannot subscribe to network changes: " + reasonOf(errno));
         subscription_.reset();
         blind_ = true;
     }
 }
 
-void ChangeMonitor::openWatches(std::vector<std::string>& complaints) {
+void ChangeMonitor::openWatches(std::vector<std::string>& diagnostics) {
     if (watches_) {
         return;
     }
@@ -144,7 +137,7 @@ void ChangeMonitor::openWatches(std::vector<std::string>& complaints) {
     rearm_ = true;
     watches_.reset(::inotify_init1(IN_NONBLOCK | IN_CLOEXEC));
     if (!watches_) {
-        complaints.push_back("cannot watch files: " + reasonOf(errno));
+        diagnostics.push_back("cannot watch files: " + reasonOf(errno));
         blind_ = true;
     }
 }
@@ -180,10 +173,10 @@ struct ChangeMonitor::Arming {
 };
 
 void ChangeMonitor::watchAll(const std::vector<WatchedPlace>& places,
-                             std::vector<std::string>& complaints) {
+                             std::vector<std::string>& diagnostics) {
     Arming arming;
     for (const WatchedPlace& place : places) {
-        watch(place, arming, complaints);
+        watch(place, arming, diagnostics);
     }
     for (const auto& [watch, unused] : interests_) {
         if (!arming.interests.contains(watch)) {
@@ -196,7 +189,7 @@ void ChangeMonitor::watchAll(const std::vector<WatchedPlace>& places,
 }
 
 void ChangeMonitor::watch(const WatchedPlace& place, Arming& arming,
-                          std::vector<std::string>& complaints) {
+                          std::vector<std::string>& diagnostics) {
     const auto notice = [&](int watch) {
         arming.interests[watch].push_back({.name = place.namePrefix, .ancestor = false});
     };
@@ -227,7 +220,7 @@ void ChangeMonitor::watch(const WatchedPlace& place, Arming& arming,
         return;
     }
     // Anything else, like a limit that was reached, leaves changes unnoticed.
-    complaints.push_back("cannot watch " + place.directory + ": " + reasonOf(error));
+    diagnostics.push_back("cannot watch " + place.directory + ": " + reasonOf(error));
     blind_ = true;
 }
 

@@ -9,7 +9,7 @@
 #include <string_view>
 #include <vector>
 
-#include "clients/Lease.h"
+#include "kernel/WatchedPlace.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace ZR::Live {
@@ -28,7 +28,7 @@ class ChangeMonitor {
 
     /// Watches exactly these places from now on and forgets what happened before.
     /// To be called before the state is read, so that nothing falls in between.
-    void begin(const std::vector<WatchedPlace>& places, std::vector<std::string>& complaints);
+    void begin(const std::vector<WatchedPlace>& places, std::vector<std::string>& diagnostics);
 
     /// Watches these processes for their end, and no others. One that has ended
     /// already counts as a change. Where the kernel cannot watch processes (before
@@ -51,10 +51,10 @@ class ChangeMonitor {
 
     struct Arming;
 
-    void openSubscription(std::vector<std::string>& complaints);
-    void openWatches(std::vector<std::string>& complaints);
-    void watchAll(const std::vector<WatchedPlace>& places, std::vector<std::string>& complaints);
-    void watch(const WatchedPlace& place, Arming& arming, std::vector<std::string>& complaints);
+    void openSubscription(std::vector<std::string>& diagnostics);
+    void openWatches(std::vector<std::string>& diagnostics);
+    void watchAll(const std::vector<WatchedPlace>& places, std::vector<std::string>& diagnostics);
+    void watch(const WatchedPlace& place, Arming& arming, std::vector<std::string>& diagnostics);
     int watchAncestor(std::string directory, Arming& arming) const;
     bool drainSubscription();
     bool drainWatches();

@@ -4,8 +4,6 @@
 #include <linux/netlink.h>
 #include <linux/rtnetlink.h>
 
-#include <algorithm>
-
 #include "kernel/Attributes.h"
 
 namespace ZR::Live {
@@ -14,7 +12,16 @@ namespace {
 // Headers of kernels before 5.14 lack it.
 constexpr std::uint16_t parentDeviceName = 56;
 
-constexpr std::size_t maximalNameLength = 15;  // IFNAMSIZ without the NUL
+/// The first name among the attributes of a link. The kernel writes it before all else.
+std::optional<InterfaceName> nameIn(std::span<const std::byte> attributes) {
+    AttributeWalk walk{attributes};
+    for (Attribute attribute; walk.next(attribute);) {
+        if (attribute.type == IFLA_IFNAME) {
+            return InterfaceName::from(textOf(attribute.payload));
+        }
+    }
+    return std::nullopt;
+}
 
 bool parseLinkInfo(std::span<const std::byte> payload, Link& link) {
     AttributeWalk walk{payload};
@@ -31,8 +38,11 @@ bool parseLinkInfo(std::span<const std::byte> payload, Link& link) {
 bool parseAttribute(const Attribute& attribute, Link& link) {
     switch (attribute.type) {
         case IFLA_IFNAME:
-            link.name = textOf(attribute.payload);
-            return true;
+            if (const auto name = InterfaceName::from(textOf(attribute.payload))) {
+                link.name = *name;
+                return true;
+            }
+            return false;
         case IFLA_OPERSTATE:
             link.operstate = valueAt<std::uint8_t>(attribute.payload).value_or(0);
             return true;
@@ -43,9 +53,6 @@ bool parseAttribute(const Attribute& attribute, Link& link) {
             return true;
         case IFLA_MASTER:
             link.master = valueAt<std::uint32_t>(attribute.payload).value_or(0);
-            return true;
-        case IFLA_LINK_NETNSID:
-            link.netnsid = valueAt<std::int32_t>(attribute.payload);
             return true;
         case IFLA_LINKINFO:
             return parseLinkInfo(attribute.payload, link);
@@ -59,13 +66,6 @@ bool parseAttribute(const Attribute& attribute, Link& link) {
 
 }  // namespace
 
-bool isInterfaceName(std::string_view text) noexcept {
-    return !text.empty() && text.size() <= maximalNameLength && text != "." && text != ".." &&
-           std::none_of(text.begin(), text.end(), [](char byte) {
-               return byte == '/' || byte == '\0' || byte == ' ' || (byte >= '\t' && byte <= '\r');
-           });
-}
-
 std::optional<Link> parseLink(std::span<const std::byte> message) {
     const auto header = valueAt<nlmsghdr>(message);
     if (!header || header->nlmsg_type != RTM_NEWLINK || header->nlmsg_len > message.size() ||
@@ -77,21 +77,25 @@ std::optional<Link> parseLink(std::span<const std::byte> message) {
     if (!info || info->ifi_index <= 0) {
         return std::nullopt;
     }
+    const auto attributes = body.subspan(sizeof(ifinfomsg));
+    const auto name = nameIn(attributes);
+    if (!name) {
+        return std::nullopt;
+    }
     Link link{.ifindex = static_cast<std::uint32_t>(info->ifi_index),
-              .name = {},
+              .name = *name,
               .flags = info->ifi_flags,
               .arphrdType = info->ifi_type,
               .kind = {},
               .slaveKind = {},
-              .netnsid = {},
               .carrier = {}};
-    AttributeWalk walk{body.subspan(sizeof(ifinfomsg))};
+    AttributeWalk walk{attributes};
     for (Attribute attribute; walk.next(attribute);) {
         if (!parseAttribute(attribute, link)) {
             return std::nullopt;
         }
     }
-    if (walk.malformed() || !isInterfaceName(link.name)) {
+    if (walk.malformed()) {
         return std::nullopt;
     }
     return link;

@@ -5,31 +5,27 @@
 #include <optional>
 #include <span>
 #include <string>
-#include <string_view>
+
+#include "formats/InterfaceName.h"
 
 namespace ZR::Live {
 
 /// What the kernel tells about one link.
 struct Link {
     std::uint32_t ifindex = 0;
-    std::string name;                     ///< the kernel's name, never an alternative one
-    std::uint32_t flags = 0;              ///< IFF_*
-    std::uint8_t operstate = 0;           ///< IF_OPER_*, RFC 2863 states
-    std::uint16_t arphrdType = 0;         ///< ARPHRD_*
-    std::string kind;                     ///< driver kind ("bridge"); empty for most devices
-    std::string slaveKind;                ///< kind of the master, as the link's port of it
-    std::uint32_t master = 0;             ///< ifindex of the master; 0 for none
-    std::optional<std::int32_t> netnsid;  ///< namespace of the peer, when it is another
-    bool hasParentDevice = false;         ///< sits on a bus: a real or paravirtual device
-    std::optional<bool> carrier;          ///< nullopt when the kernel does not tell
-    bool wireless = false;                ///< not from netlink, which does not know it
+    InterfaceName name;            ///< the kernel's name, never an alternative one
+    std::uint32_t flags = 0;       ///< IFF_*
+    std::uint8_t operstate = 0;    ///< IF_OPER_*, RFC 2863 states
+    std::uint16_t arphrdType = 0;  ///< ARPHRD_*
+    std::string kind;              ///< driver kind ("bridge"); empty for most devices
+    std::string slaveKind;         ///< kind of the master, as the link's port of it
+    std::uint32_t master = 0;      ///< ifindex of the master; 0 for none
+    bool hasParentDevice = false;  ///< sits on a bus: a real or paravirtual device
+    std::optional<bool> carrier;   ///< nullopt when the kernel does not tell
+    bool wireless = false;         ///< not from netlink, which does not know it
 
     bool operator==(const Link&) const = default;
 };
-
-/// At most 15 bytes, no "/", neither "." nor "..", no blank: what the kernel takes
-/// for a name. Anything else must not become a part of a file name.
-[[nodiscard]] bool isInterfaceName(std::string_view text) noexcept;
 
 /// Facts of one RTM_NEWLINK message, header included. Any bytes give facts or
 /// nullopt: another or too short a message, an attribute whose length cannot be

@@ -11,9 +11,9 @@
 #include <cstdint>
 #include <optional>
 #include <span>
-#include <system_error>
 #include <utility>
 
+#include "formats/SystemErrors.h"
 #include "kernel/Attributes.h"
 
 namespace ZR::Live {
@@ -25,10 +25,6 @@ constexpr int attempts = 3;
 // functions may need more.
 constexpr std::size_t firstBufferSize = std::size_t{32} << 10U;
 constexpr std::size_t largestBufferSize = std::size_t{1} << 20U;
-
-std::string reasonOf(int error) {
-    return std::generic_category().message(error);
-}
 
 /// The errno that the kernel says, which it says negated; EBADMSG where it says none.
 int errorIn(std::optional<std::int32_t> code) {
@@ -87,14 +83,14 @@ bool RtnetlinkReader::dump(std::uint16_t request, const char* what, Parse parse,
     const std::string about = std::string{"network "} + what + ": ";
     if (outcome.unreadable != 0) {
         state.certain = false;
-        state.complaints.push_back(about + std::to_string(outcome.unreadable) +
-                                   " malformed messages left out");
+        state.diagnostics.push_back(about + std::to_string(outcome.unreadable) +
+                                    " malformed messages left out");
     }
     if (outcome.end == End::Complete) {
         return true;
     }
     state.certain = false;
-    state.complaints.push_back(about + outcome.reason);
+    state.diagnostics.push_back(about + outcome.reason);
     if (outcome.end == End::Interrupted) {
         return true;
     }

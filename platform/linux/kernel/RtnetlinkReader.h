@@ -17,7 +17,7 @@ struct NetworkState {
     std::vector<Link> links;         ///< empty when they could not be read
     std::vector<Address> addresses;  ///< empty when they could not be read
     bool certain = true;             ///< false: incomplete, or mixed from two moments; read again
-    std::vector<std::string> complaints;
+    std::vector<std::string> diagnostics;
 
     bool operator==(const NetworkState&) const = default;
 };

@@ -10,9 +10,7 @@
 #include <optional>
 #include <span>
 #include <string>
-#include <utility>
 
-#include "formats/AddressText.h"
 #include "formats/Files.h"
 #include "formats/Numbers.h"
 
@@ -53,7 +51,7 @@ void forEachLine(std::string_view text, Action action) {
 }
 
 struct EndPoint {
-    std::string address;  // empty: none
+    std::optional<IpAddress> address;
     std::uint16_t port = 0;
 };
 
@@ -70,7 +68,7 @@ std::optional<EndPoint> parseEndPoint(std::string_view text) {
     }
     EndPoint point{.address = {}, .port = *port};
     if (*address != INADDR_ANY) {
-        point.address = addressText(AF_INET, std::as_bytes(std::span{&*address, 1})).value_or("");
+        point.address = IpAddress::fromBytes(AF_INET, std::as_bytes(std::span{&*address, 1}));
     }
     return point;
 }
@@ -81,11 +79,10 @@ std::vector<PortSocket> parseUdpSockets(std::string_view text) {
     std::vector<PortSocket> sockets;
     // Number, own end, other end.
     forEachLine<3>(text, [&](const std::array<std::string_view, 3>& words) {
-        auto own = parseEndPoint(words[1]);
-        auto other = parseEndPoint(words[2]);
+        const auto own = parseEndPoint(words[1]);
+        const auto other = parseEndPoint(words[2]);
         if (own && other && own->port == clientPort) {
-            sockets.push_back(
-                {.address = std::move(own->address), .peer = std::move(other->address)});
+            sockets.push_back({.address = own->address, .peer = other->address});
         }
     });
     return sockets;
@@ -107,15 +104,17 @@ std::vector<std::uint32_t> parsePacketLinks(std::string_view text) {
     return links;
 }
 
-void readSockets(const Roots& roots, ClientFacts& facts) {
+ClientSockets readSockets(const Roots& roots, std::vector<std::string>& diagnostics) {
     // Of this thread: namespaces belong to threads, not to processes.
     const std::string directory = roots.proc + "/thread-self/net";
-    const auto udp = readOptionalFile(pathIn(directory, "udp"), facts.complaints);
-    facts.sockets = parseUdpSockets(udp.value_or(""));
-    if (!facts.sockets.empty()) {
-        const auto packet = readOptionalFile(pathIn(directory, "packet"), facts.complaints);
-        facts.packetLinks = parsePacketLinks(packet.value_or(""));
+    ClientSockets sockets;
+    const auto udp = readOptionalFile(pathIn(directory, "udp"), diagnostics);
+    sockets.bound = parseUdpSockets(udp.value_or(""));
+    if (!sockets.bound.empty()) {
+        const auto packet = readOptionalFile(pathIn(directory, "packet"), diagnostics);
+        sockets.packetLinks = parsePacketLinks(packet.value_or(""));
     }
+    return sockets;
 }
 
 }  // namespace ZR::Live

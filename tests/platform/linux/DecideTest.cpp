@@ -26,19 +26,23 @@ constexpr const char* server = "198.51.100.1";
 
 using Servers = std::vector<std::string>;
 
+/// None for an empty text.
+std::optional<IpAddress> optionalAddress(const std::string& text) {
+    return text.empty() ? std::nullopt : std::optional{ipAddress(text)};
+}
+
 /// One Ethernet interface eth0 that is up, and whatever a test adds to it.
 class DecideTest : public testing::Test {
   protected:
     DecideTest() {
         facts_.hostName = "host";
         facts_.links.push_back({.ifindex = index,
-                                .name = "eth0",
+                                .name = "eth0"_name,
                                 .flags = std::uint32_t{IFF_UP} | IFF_BROADCAST | IFF_LOWER_UP,
                                 .operstate = IF_OPER_UP,
                                 .arphrdType = ARPHRD_ETHER,
                                 .kind = "",
                                 .slaveKind = "",
-                                .netnsid = {},
                                 .hasParentDevice = true,
                                 .carrier = true});
     }
@@ -47,20 +51,17 @@ class DecideTest : public testing::Test {
                      std::uint32_t flags = IFA_F_PERMANENT,
                      std::uint8_t scope = RT_SCOPE_UNIVERSE) {
         facts_.addresses.push_back({.ifindex = index,
-                                    .family = AF_INET,
-                                    .text = text,
+                                    .ip = ipAddress(text),
                                     .flags = flags,
                                     .scope = scope,
-                                    .validLifetime = validLifetime,
-                                    .preferredLifetime = validLifetime});
+                                    .validLifetime = validLifetime});
         return facts_.addresses.back();
     }
     Lease& lease(const std::string& text = leased, const std::string& from = server) {
         facts_.clients.leases.push_back({.client = Client::Dhclient,
-                                         .interfaceName = "eth0",
-                                         .family = AF_INET,
-                                         .address = text,
-                                         .server = from,
+                                         .interfaceName = "eth0"_name,
+                                         .address = ipAddress(text),
+                                         .server = optionalAddress(from),
                                          .expires = now + 600});
         return facts_.clients.leases.back();
     }
@@ -73,13 +74,15 @@ class DecideTest : public testing::Test {
         return facts_.clients.managements.back();
     }
     ClientProcess& process(bool ipv6 = false) {
-        facts_.clients.processes.push_back(
-            {.client = Client::Dhclient, .interfaces = {"eth0"}, .leaseFile = "", .ipv6 = ipv6});
+        facts_.clients.processes.push_back({.client = Client::Dhclient,
+                                            .interfaces = {"eth0"_name},
+                                            .leaseFile = "",
+                                            .ipv6 = ipv6});
         return facts_.clients.processes.back();
     }
     LinkConfiguration& configuration(std::optional<bool> dhcp4) {
         facts_.clients.configurations.push_back({.client = Client::Ifcfg,
-                                                 .interfaceName = "eth0",
+                                                 .interfaceName = "eth0"_name,
                                                  .dhcp4 = dhcp4,
                                                  .dhcp6 = {},
                                                  .staticAddresses = {}});
@@ -143,7 +146,7 @@ TEST_F(DecideTest, InterfacesStandInTheOrderOfTheirIndexes) {
     for (const std::uint32_t other : {7U, 1U, 30U, 4U}) {
         Link more = link();
         more.ifindex = other;
-        more.name = "eth" + std::to_string(other);
+        more.name = interfaceName("eth" + std::to_string(other));
         facts_.links.push_back(more);
     }
     EXPECT_THAT(interfaceNames(*decide(facts_, now)),
@@ -153,7 +156,7 @@ TEST_F(DecideTest, InterfacesStandInTheOrderOfTheirIndexes) {
 TEST_F(DecideTest, AddressesBelongToTheLinkOfTheirIndex) {
     Link more = link();
     more.ifindex = 5;
-    more.name = "eth5";
+    more.name = "eth5"_name;
     facts_.links.push_back(more);
     address("192.0.2.5").ifindex = 5;
     address("192.0.2.2");
@@ -175,7 +178,7 @@ TEST_F(DecideTest, WithoutAnAddressThePropertyIsLeftOut) {
 }
 
 TEST_F(DecideTest, IPv6AddressesAreNoIPv4Address) {
-    address("2001:db8::1").family = AF_INET6;
+    address("2001:db8::1");
     EXPECT_EQ(ipv4(), PropertyValue{});
 }
 
@@ -241,7 +244,7 @@ TEST_F(DecideTest, AReleasedLeaseIsNotLive) {
 
 TEST_F(DecideTest, ALeaseOfALinkThatIsGoneShowsNowhere) {
     address(leased, 900, 0);  // leased anew, by another link
-    lease().interfaceName = "eth9";
+    lease().interfaceName = "eth9"_name;
     EXPECT_EQ(servers(), PropertyValue{Servers{}});
     facts_.clients.leases.back().expires = Lease::never;
     EXPECT_EQ(servers(), PropertyValue{Servers{}});
@@ -251,13 +254,13 @@ TEST_F(DecideTest, ALeaseOfALinkThatIsGoneShowsNowhere) {
 
 TEST_F(DecideTest, ALeaseByNameFollowsARename) {
     address(leased, 598, 0);
-    lease().interfaceName = "before";
+    lease().interfaceName = "before"_name;
     EXPECT_EQ(servers(), PropertyValue{Servers{server}});
     EXPECT_EQ(source(), number(1));
     // Two links with the address: nobody can tell which of them was called so.
     Link twin = link();
     twin.ifindex = 5;
-    twin.name = "eth5";
+    twin.name = "eth5"_name;
     facts_.links.push_back(twin);
     address(leased, 598, 0).ifindex = 5;
     EXPECT_EQ(servers(), PropertyValue{Servers{}});
@@ -265,7 +268,7 @@ TEST_F(DecideTest, ALeaseByNameFollowsARename) {
 
 TEST_F(DecideTest, ALeaseByNameWithoutAnEndFollowsARenameWhileItsClientRuns) {
     address(leased);
-    lease().interfaceName = "before";
+    lease().interfaceName = "before"_name;
     facts_.clients.leases.back().expires = Lease::never;
     EXPECT_EQ(servers(), PropertyValue{Servers{}});
     EXPECT_EQ(enabled(), PropertyValue{false});
@@ -278,26 +281,25 @@ TEST_F(DecideTest, ALeaseThatNamesItsLinkTwiceMustNameOneLink) {
     address(leased, 600, 0);
     lease().ifindex = index;
     EXPECT_EQ(servers(), PropertyValue{Servers{server}});
-    facts_.clients.leases.back().interfaceName = "renamed";
+    facts_.clients.leases.back().interfaceName = "renamed"_name;
     EXPECT_EQ(servers(), PropertyValue{Servers{}});
 }
 
 TEST_F(DecideTest, ALeaseByIndexFollowsARename) {
     address(leased, 600, 0);
     lease() = {.client = Client::Networkd,
-               .interfaceName = "",
+               .interfaceName = {},
                .ifindex = index,
-               .family = AF_INET,
-               .address = leased,
-               .server = server,
+               .address = ipAddress(leased),
+               .server = ipAddress(server),
                .expires = {}};
-    link().name = "lan0";
+    link().name = "lan0"_name;
     EXPECT_EQ(value(Properties::DHCPServerAddresses, "lan0"), PropertyValue{Servers{server}});
 }
 
 TEST_F(DecideTest, ADhcpv6LeaseNamesNoServer) {
-    address("2001:db8::7", 600, 0).family = AF_INET6;
-    lease("2001:db8::7", "").family = AF_INET6;
+    address("2001:db8::7", 600, 0);
+    lease("2001:db8::7", "");
     EXPECT_EQ(servers(), PropertyValue{Servers{}});
 }
 
@@ -353,11 +355,10 @@ TEST_F(DecideTest, TheManagersLeaseStandsAboveItsConfiguration) {
     management(false);
     address(leased, 600, 0);
     lease() = {.client = Client::Networkd,
-               .interfaceName = "",
+               .interfaceName = {},
                .ifindex = index,
-               .family = AF_INET,
-               .address = leased,
-               .server = server,
+               .address = ipAddress(leased),
+               .server = ipAddress(server),
                .clientAlive = true,
                .expires = {}};
     EXPECT_EQ(enabled(), PropertyValue{true});
@@ -373,7 +374,7 @@ TEST_F(DecideTest, AManagerWhoseConfigurationIsUnknownSaysNothing) {
 TEST_F(DecideTest, AClientOfEitherProtocolOnTheLinkEnables) {
     process(true);
     EXPECT_EQ(enabled(), PropertyValue{true});
-    facts_.clients.processes.back().interfaces = {"eth1"};
+    facts_.clients.processes.back().interfaces = {"eth1"_name};
     EXPECT_EQ(enabled(), PropertyValue{false});
 }
 
@@ -390,7 +391,7 @@ TEST_F(DecideTest, AnIPv4AddressWithAnEndEnables) {
 }
 
 TEST_F(DecideTest, AnIPv6AddressWithAnEndEnablesNothing) {
-    address("2001:db8::1", 600, 0).family = AF_INET6;
+    address("2001:db8::1", 600, 0);
     EXPECT_EQ(enabled(), PropertyValue{false});
 }
 
@@ -405,7 +406,7 @@ TEST_F(DecideTest, ALiveLeaseOfTheAddressIsDhcpOrBootp) {
 }
 
 TEST_F(DecideTest, AnAddressThatTheManagerWasToldIsStatic) {
-    management(true).staticAddresses = {"192.0.2.1"};
+    management(true).staticAddresses = {"192.0.2.1"_ip};
     address("192.0.2.1");
     EXPECT_EQ(source(), number(3));
 }
@@ -413,9 +414,9 @@ TEST_F(DecideTest, AnAddressThatTheManagerWasToldIsStatic) {
 TEST_F(DecideTest, LinkScopeIn169254IsLinkLocal) {
     address("169.254.3.4", Address::infinite, IFA_F_PERMANENT, RT_SCOPE_LINK);
     EXPECT_EQ(source(), number(4));
-    facts_.addresses.back().text = "192.0.2.1";
+    facts_.addresses.back().ip = "192.0.2.1"_ip;
     EXPECT_EQ(source(), number(3));
-    facts_.addresses.back().text = "169.254.3.4";
+    facts_.addresses.back().ip = "169.254.3.4"_ip;
     facts_.addresses.back().scope = RT_SCOPE_UNIVERSE;
     EXPECT_EQ(source(), number(3));
 }
@@ -450,7 +451,7 @@ TEST_F(DecideTest, WithoutAnAddressTheIntentCounts) {
     EXPECT_EQ(source(), number(0));
     management(false).linkLocal4 = true;
     EXPECT_EQ(source(), number(4));
-    facts_.clients.managements.back().staticAddresses = {"192.0.2.1"};
+    facts_.clients.managements.back().staticAddresses = {"192.0.2.1"_ip};
     EXPECT_EQ(source(), number(3));
     facts_.clients.managements.back().dhcp4 = true;
     EXPECT_EQ(source(), number(1));
@@ -493,7 +494,7 @@ TEST_F(DecideTest, AConfigurationWithoutDhcpSpeaksLouderThanALifetime) {
     facts_.clients.configurations.back().dhcp6 = true;
     EXPECT_EQ(enabled(), PropertyValue{true});
     facts_.clients.configurations.back() = {.client = Client::Ifcfg,
-                                            .interfaceName = "eth0",
+                                            .interfaceName = "eth0"_name,
                                             .dhcp4 = {},
                                             .dhcp6 = {},
                                             .staticAddresses = {}};
@@ -510,7 +511,7 @@ TEST_F(DecideTest, APermanentAddressIsWhatItsConfigurationSays) {
     address(leased);
     LinkConfiguration& told = configuration(true);
     EXPECT_EQ(source(), number(1));
-    told.staticAddresses = {leased};
+    told.staticAddresses = {ipAddress(leased)};
     EXPECT_EQ(source(), number(3)) << "a further address that was told";
     told.staticAddresses.clear();
     told.dhcp4 = false;
@@ -529,7 +530,7 @@ TEST_F(DecideTest, WithoutAnAddressTheConfigurationIsTheIntent) {
     EXPECT_EQ(source(), number(5));
     told.linkLocal4 = true;
     EXPECT_EQ(source(), number(4));
-    told.staticAddresses = {leased};
+    told.staticAddresses = {ipAddress(leased)};
     EXPECT_EQ(source(), number(3));
     told.bootp4 = true;
     EXPECT_EQ(source(), number(2));
@@ -571,7 +572,7 @@ TEST_F(DecideTest, AnAddressOfTheSystemsStartStaysWhatItWas) {
 
 TEST_F(DecideTest, ASocketAtTheAddressTellsOfAClientAndItsServer) {
     address(leased);
-    facts_.clients.sockets = {{.address = leased, .peer = server}};
+    facts_.clients.sockets.bound = {{.address = ipAddress(leased), .peer = ipAddress(server)}};
     EXPECT_EQ(enabled(), PropertyValue{true});
     EXPECT_EQ(source(), number(1));
     EXPECT_EQ(servers(), PropertyValue{Servers{server}});
@@ -580,17 +581,17 @@ TEST_F(DecideTest, ASocketAtTheAddressTellsOfAClientAndItsServer) {
 }
 
 TEST_F(DecideTest, ASocketOfAllLinksTellsOfTheLinkThatIsHeard) {
-    facts_.clients.sockets = {{.address = "", .peer = ""}};
+    facts_.clients.sockets.bound = {{.address = {}, .peer = {}}};
     EXPECT_EQ(enabled(), PropertyValue{false});
-    facts_.clients.packetLinks = {index};
+    facts_.clients.sockets.packetLinks = {index};
     EXPECT_EQ(enabled(), PropertyValue{true});
     EXPECT_EQ(source(), number(0));
 }
 
 TEST_F(DecideTest, ServersOfIPv6StandBehindThoseOfIPv4) {
-    address("2001:db8::7", 600, 0).family = AF_INET6;
+    address("2001:db8::7", 600, 0);
     address(leased, 600, 0);
-    lease("2001:db8::7", "fe80::1").family = AF_INET6;
+    lease("2001:db8::7", "fe80::1");
     EXPECT_EQ(servers(), PropertyValue{Servers{"fe80::1"}});
     lease();
     EXPECT_EQ(servers(), (PropertyValue{Servers{server, "fe80::1"}}));
@@ -661,15 +662,14 @@ TEST_F(DecideTest, TenThousandInterfacesTakeNoQuadraticTime) {
     for (std::uint32_t i = 1; i <= 10'000; ++i) {
         const std::string name = "eth" + std::to_string(i);
         facts_.links.push_back({.ifindex = i,
-                                .name = name,
+                                .name = interfaceName(name),
                                 .flags = IFF_UP,
                                 .kind = "",
                                 .slaveKind = "",
-                                .netnsid = {},
                                 .carrier = {}});
         const std::string text = "10." + std::to_string(i / 250) + ".1." + std::to_string(i % 250);
         address(text, 600, 0).ifindex = i;
-        lease(text).interfaceName = name;
+        lease(text).interfaceName = interfaceName(name);
     }
     const auto tree = decide(facts_, now);
     EXPECT_EQ(tree->nodes().size(), 10'002U);

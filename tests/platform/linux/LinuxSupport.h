@@ -3,6 +3,7 @@
 #include <fcntl.h>
 #include <linux/netlink.h>
 #include <linux/rtnetlink.h>
+#include <sys/socket.h>
 #include <sys/stat.h>
 
 #include <array>
@@ -12,18 +13,44 @@
 #include <cstring>
 #include <filesystem>
 #include <fstream>
+#include <ostream>
 #include <span>
 #include <stdexcept>
 #include <string>
 #include <string_view>
 #include <vector>
 
-#include "clients/Lease.h"
+#include "clients/ClientFacts.h"
+#include "formats/InterfaceName.h"
+#include "formats/IpAddress.h"
 #include "formats/Roots.h"
 #include "zrclient/Snapshot.h"
 #include "zrcommon/File.h"
 
 namespace ZR::Live {
+
+/// An address or the name of an interface as a test writes it.
+inline IpAddress ipAddress(std::string_view text) {
+    return IpAddress::fromText(text.find(':') == std::string_view::npos ? AF_INET : AF_INET6, text)
+        .value();
+}
+inline IpAddress operator""_ip(const char* text, std::size_t size) {
+    return ipAddress({text, size});
+}
+inline InterfaceName interfaceName(std::string_view text) {
+    return InterfaceName::from(text).value();
+}
+inline InterfaceName operator""_name(const char* text, std::size_t size) {
+    return interfaceName({text, size});
+}
+
+/// What a failing comparison prints.
+inline void PrintTo(const IpAddress& address, std::ostream* out) {
+    *out << address.text();
+}
+inline void PrintTo(const InterfaceName& name, std::ostream* out) {
+    *out << name.view();
+}
 
 /// A captured file of a real client.
 inline std::string sample(const std::string& name) {

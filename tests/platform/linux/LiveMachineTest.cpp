@@ -12,7 +12,7 @@
 
 #include "LinuxSupport.h"
 #include "ScriptedTransport.h"
-#include "clients/Clients.h"
+#include "StateReaders.h"
 #include "zrcommon/SystemName.h"
 #include "zrlinux/LiveSource.h"
 
@@ -60,7 +60,7 @@ class LiveMachineTest : public testing::Test {
             return networkd_;
         };
         surroundings.now = [this] { return now_; };
-        surroundings.complain = [this](std::string_view text) { complaints_.emplace_back(text); };
+        surroundings.report = [this](std::string_view text) { diagnostics_.emplace_back(text); };
         machine_ = std::make_unique<LiveMachine>(std::move(surroundings));
         return *machine_;
     }
@@ -68,9 +68,9 @@ class LiveMachineTest : public testing::Test {
     TemporaryDirectory root_;
     std::int64_t now_ = 1'795'216'200;
     std::chrono::steady_clock::time_point uptime_{std::chrono::hours{1000}};
-    NetworkdAnswer networkd_;
+    NetworkdResponse networkd_;
     int asked_ = 0;
-    std::vector<std::string> complaints_;
+    std::vector<std::string> diagnostics_;
     std::unique_ptr<LiveMachine> machine_;
 };
 
@@ -84,7 +84,7 @@ TEST_F(LiveMachineTest, CapturedNetworkdLeaseOnItsLink) {
     EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPServerAddresses),
               PropertyValue{Servers{"198.51.100.1"}});
     EXPECT_EQ(valueOf(*tree, "eth1", Properties::IPv4Address), PropertyValue{"198.51.100.110"});
-    EXPECT_THAT(complaints_, IsEmpty());
+    EXPECT_THAT(diagnostics_, IsEmpty());
 }
 
 TEST_F(LiveMachineTest, NetworkdItselfTellsOfTheServerOfADhcpv6Lease) {
@@ -122,14 +122,14 @@ TEST_F(LiveMachineTest, ANetworkdThatDoesNotAnswerIsLeftAloneForAWhile) {
     EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),
               PropertyValue{Servers{"198.51.100.1"}})
         << "its files tell it, too";
-    EXPECT_THAT(complaints_, ElementsAre("too busy"));
+    EXPECT_THAT(diagnostics_, ElementsAre("too busy"));
     static_cast<void>(machine.read());
     EXPECT_EQ(asked_, 1);
     uptime_ += std::chrono::seconds{31};
     networkd_ = {.json = "{", .reason = ""};
     static_cast<void>(machine.read());
     EXPECT_EQ(asked_, 2);
-    EXPECT_EQ(complaints_.back(), "cannot use what systemd-networkd says: no JSON object");
+    EXPECT_EQ(diagnostics_.back(), "cannot use what systemd-networkd says: no JSON object");
 }
 
 TEST_F(LiveMachineTest, CapturedDhclientLeaseLivesUntilItsEnd) {
@@ -211,7 +211,7 @@ TEST_F(LiveMachineTest, WhatCouldNotBeReadIsTriedAgain) {
     EXPECT_TRUE(machine.changed()) << "it may be over without a sign";
     ASSERT_EQ(machine.read()->remarks().size(), 1U);
     EXPECT_FALSE(machine.changed());
-    EXPECT_EQ(complaints_.size(), 1U);
+    EXPECT_EQ(diagnostics_.size(), 1U);
 }
 
 TEST_F(LiveMachineTest, WhatSeveralReadersCannotReadIsToldOnce) {
@@ -236,10 +236,10 @@ TEST_F(LiveMachineTest, UnreadableLinksGiveNoInterfacesAndOneLine) {
                                  refused(EPERM), links(1), address(2, {192, 0, 2, 1})});
     EXPECT_THAT(interfaceNames(*machine.read()), ElementsAre("eth1"));
     EXPECT_THAT(interfaceNames(*machine.read()), IsEmpty());
-    EXPECT_THAT(complaints_, ElementsAre("network links: refused: Operation not permitted"));
+    EXPECT_THAT(diagnostics_, ElementsAre("network links: refused: Operation not permitted"));
     EXPECT_TRUE(machine.changed()) << "to be read again";
     EXPECT_THAT(interfaceNames(*machine.read()), IsEmpty());
-    EXPECT_EQ(complaints_.size(), 1U) << "a lasting trouble is told once";
+    EXPECT_EQ(diagnostics_.size(), 1U) << "a lasting trouble is told once";
     EXPECT_THAT(interfaceNames(*machine.read()), ElementsAre("eth1"));
     EXPECT_FALSE(machine.changed());
 }
@@ -250,7 +250,7 @@ TEST_F(LiveMachineTest, ATroubleThatReturnsIsToldAgain) {
     for (int i = 0; i < 3; ++i) {
         static_cast<void>(machine.read());
     }
-    EXPECT_EQ(complaints_.size(), 2U);
+    EXPECT_EQ(diagnostics_.size(), 2U);
 }
 
 TEST_F(LiveMachineTest, AKernelThatDoesNotAnswerHoldsNobodyUp) {
@@ -258,8 +258,8 @@ TEST_F(LiveMachineTest, AKernelThatDoesNotAnswerHoldsNobodyUp) {
     EXPECT_THAT(interfaceNames(*machine.read()), ElementsAre("eth1"));
     const auto tree = machine.read();
     EXPECT_THAT(interfaceNames(*tree), IsEmpty()) << "what was once read is not shown again";
-    EXPECT_THAT(complaints_, ElementsAre(HasSubstr("network links: no answer: ")));
-    EXPECT_THAT(tree->remarks(), testing::ElementsAreArray(complaints_));
+    EXPECT_THAT(diagnostics_, ElementsAre(HasSubstr("network links: no answer: ")));
+    EXPECT_THAT(tree->remarks(), testing::ElementsAreArray(diagnostics_));
     EXPECT_TRUE(machine.changed()) << "to be read again";
 }
 
@@ -354,8 +354,8 @@ TEST_F(LiveMachineTest, EveryPlaceThatItReadsIsWatched) {
     std::vector<std::string> files{"/srv/own.leases", "/etc/systemd/network/a.network",
                                    "/run/systemd/network/a.network.d/a.conf",
                                    "/etc/network/interfaces.d/a"};
-    for (const ClientSource& source : clientSources()) {
-        for (const ClientPlace& place : source.places) {
+    for (const StateReader& reader : stateReaders()) {
+        for (const StatePlace& place : reader.places) {
             files.push_back(std::string{place.directory} + '/' + std::string{place.namePrefix} +
                             "x");
         }

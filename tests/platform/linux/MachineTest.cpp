@@ -24,26 +24,21 @@ class MachineTest : public testing::Test {
         for (const std::uint32_t ifindex : {2U, 3U}) {
             const std::string number = std::to_string(ifindex);
             facts_.links.push_back({.ifindex = ifindex,
-                                    .name = "eth" + number,
+                                    .name = interfaceName("eth" + number),
                                     .flags = std::uint32_t{IFF_UP} | IFF_BROADCAST,
                                     .arphrdType = ARPHRD_ETHER,
                                     .kind = "",
                                     .slaveKind = "",
-                                    .netnsid = {},
                                     .carrier = {}});
-            facts_.addresses.push_back({.ifindex = ifindex,
-                                        .family = AF_INET,
-                                        .text = "192.0.2." + number,
-                                        .validLifetime = 600,
-                                        .preferredLifetime = 600});
+            facts_.addresses.push_back(
+                {.ifindex = ifindex, .ip = ipAddress("192.0.2." + number), .validLifetime = 600});
         }
     }
     static Lease lease(const std::string& interface, const std::string& address) {
         return {.client = Client::Dhcpcd,
-                .interfaceName = interface,
-                .family = AF_INET,
-                .address = address,
-                .server = "192.0.2.1",
+                .interfaceName = InterfaceName::from(interface),
+                .address = ipAddress(address),
+                .server = "192.0.2.1"_ip,
                 .expires = now + 600};
     }
     Machine& machine() {
@@ -57,9 +52,8 @@ class MachineTest : public testing::Test {
 };
 
 TEST_F(MachineTest, LeasesOfBothProtocolsStandApart) {
-    facts_.addresses.push_back({.ifindex = 2, .family = AF_INET6, .text = "2001:db8::2"});
+    facts_.addresses.push_back({.ifindex = 2, .ip = "2001:db8::2"_ip});
     facts_.clients.leases = {lease("eth2", "192.0.2.2"), lease("eth2", "2001:db8::2")};
-    facts_.clients.leases[1].family = AF_INET6;
     const InterfaceView& view = first();
     EXPECT_THAT(view.leases, ElementsAre(Pointee(facts_.clients.leases[0])));
     EXPECT_THAT(view.leases6, ElementsAre(Pointee(facts_.clients.leases[1])));
@@ -104,23 +98,22 @@ TEST_F(MachineTest, AClientThatNamesNoLinkMeansTheOneThatHasItsAddress) {
     facts_.clients.leases = {lease("", "192.0.2.3")};
     EXPECT_EQ(first().leases.size(), 0U);
     EXPECT_THAT(machine().interfaces()[1].leases, ElementsAre(Pointee(facts_.clients.leases[0])));
-    facts_.addresses[0].text = "192.0.2.3";
+    facts_.addresses[0].ip = "192.0.2.3"_ip;
     EXPECT_EQ(machine().interfaces()[1].leases.size(), 0U) << "two links have it";
 }
 
 TEST_F(MachineTest, WhatTheKernelWasGivenIsTheOnlyAddressThatNobodyElseSpeaksFor) {
-    facts_.clients.boot = {.bootp = true, .server = "192.0.2.1", .origin = "pnp"};
+    facts_.clients.boot = {.bootp = true, .server = "192.0.2.1"_ip, .origin = "pnp"};
     for (Address& address : facts_.addresses) {
         address.validLifetime = Address::infinite;
     }
     EXPECT_THAT(first().leases, IsEmpty()) << "there are two";
-    facts_.addresses[1] = {.ifindex = 3, .family = AF_INET6, .text = "2001:db8::3"};
+    facts_.addresses[1] = {.ifindex = 3, .ip = "2001:db8::3"_ip};
     EXPECT_THAT(first().leases, ElementsAre(Pointee(Lease{.client = Client::KernelBoot,
-                                                          .interfaceName = "",
+                                                          .interfaceName = {},
                                                           .ifindex = 2,
-                                                          .family = AF_INET,
-                                                          .address = "192.0.2.2",
-                                                          .server = "192.0.2.1",
+                                                          .address = "192.0.2.2"_ip,
+                                                          .server = "192.0.2.1"_ip,
                                                           .bootp = true,
                                                           .expires = Lease::never,
                                                           .origin = "pnp"})));
@@ -128,14 +121,14 @@ TEST_F(MachineTest, WhatTheKernelWasGivenIsTheOnlyAddressThatNobodyElseSpeaksFor
     EXPECT_THAT(first().leases, IsEmpty()) << "the kernel's has no end";
     facts_.addresses[0].validLifetime = Address::infinite;
     facts_.clients.configurations = {{.client = Client::Ifupdown,
-                                      .interfaceName = "eth2",
+                                      .interfaceName = "eth2"_name,
                                       .dhcp4 = false,
                                       .dhcp6 = {},
                                       .staticAddresses = {}}};
     EXPECT_THAT(first().leases, IsEmpty());
     facts_.clients.configurations.clear();
     facts_.clients.processes = {
-        {.client = Client::Udhcpc, .interfaces = {"eth2"}, .leaseFile = ""}};
+        {.client = Client::Udhcpc, .interfaces = {"eth2"_name}, .leaseFile = ""}};
     EXPECT_THAT(first().leases, IsEmpty());
     facts_.clients.processes.clear();
     facts_.addresses.clear();
@@ -150,7 +143,7 @@ TEST_F(MachineTest, AClientThatNamesLinksByIndexIsTakenAtItsWord) {
 
 TEST_F(MachineTest, TheFirstConfigurationOfALinkCounts) {
     const LinkConfiguration one{.client = Client::Ifupdown,
-                                .interfaceName = "eth2",
+                                .interfaceName = "eth2"_name,
                                 .dhcp4 = true,
                                 .dhcp6 = {},
                                 .staticAddresses = {}};
@@ -162,20 +155,20 @@ TEST_F(MachineTest, TheFirstConfigurationOfALinkCounts) {
 }
 
 TEST_F(MachineTest, ASocketBelongsToTheLinkOfItsAddress) {
-    facts_.clients.sockets = {{.address = "192.0.2.3", .peer = "192.0.2.1"},
-                              {.address = "192.0.2.99", .peer = ""}};
+    facts_.clients.sockets.bound = {{.address = "192.0.2.3"_ip, .peer = "192.0.2.1"_ip},
+                                    {.address = "192.0.2.99"_ip, .peer = {}}};
     EXPECT_EQ(first().socket, nullptr);
-    EXPECT_THAT(machine().interfaces()[1].socket, Pointee(facts_.clients.sockets[0]));
+    EXPECT_THAT(machine().interfaces()[1].socket, Pointee(facts_.clients.sockets.bound[0]));
 }
 
 TEST_F(MachineTest, ASocketOfAllLinksTellsOfThoseThatAreHeardWhileNoClientIsSeen) {
-    facts_.clients.sockets = {{.address = "", .peer = ""}};
+    facts_.clients.sockets.bound = {{.address = {}, .peer = {}}};
     EXPECT_EQ(first().openSocket, nullptr);
-    facts_.clients.packetLinks = {2, 77};
+    facts_.clients.sockets.packetLinks = {2, 77};
     EXPECT_NE(first().openSocket, nullptr);
     EXPECT_EQ(machine().interfaces()[1].openSocket, nullptr);
     facts_.clients.processes = {
-        {.client = Client::Dhclient, .interfaces = {"eth3"}, .leaseFile = ""}};
+        {.client = Client::Dhclient, .interfaces = {"eth3"_name}, .leaseFile = ""}};
     EXPECT_EQ(first().openSocket, nullptr);
     facts_.clients.processes[0].ipv6 = true;
     EXPECT_NE(first().openSocket, nullptr);

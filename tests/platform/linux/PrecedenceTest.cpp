@@ -5,6 +5,8 @@
 #include <map>
 #include <set>
 
+#include "LinuxSupport.h"
+
 namespace ZR::Live {
 namespace {
 
@@ -24,8 +26,7 @@ TEST(Precedence, RowsOfAPropertyStandTogether) {
 }
 
 TEST(Precedence, TheLastRowOfEachPropertyAnswersForAnyInterface) {
-    const Link link{
-        .ifindex = 1, .name = "e", .kind = "", .slaveKind = "", .netnsid = {}, .carrier = {}};
+    const Link link{.ifindex = 1, .name = "e"_name, .kind = "", .slaveKind = "", .carrier = {}};
     std::map<Properties, bool> answered;
     for (const DecisionRow& row : precedence()) {
         InterfaceView view;

@@ -18,7 +18,7 @@ TEST(ConnmanSettings, AddressOfAServiceThatUsesDhcp) {
                                    "IPv4.method=dhcp\n"
                                    "IPv4.DHCP.LastAddress=198.51.100.7\n"
                                    "IPv6.method=auto\n"),
-              (ConnmanSettings{.dhcp4 = true, .lastAddress = "198.51.100.7"}));
+              (ConnmanSettings{.dhcp4 = true, .lastAddress = "198.51.100.7"_ip}));
 }
 
 TEST(ConnmanSettings, AnyTextGivesSettings) {
@@ -45,15 +45,14 @@ TEST_F(ConnmanTest, WhileItRunsItsAddressesAreClaims) {
     const ClientFacts facts = readWith(readConnman, root_, running(Client::Connman));
     const std::string directory = root_.path("/var/lib/connman/ethernet_1_cable");
     EXPECT_THAT(facts.leases, ElementsAre(Lease{.client = Client::Connman,
-                                                .interfaceName = "",
-                                                .family = AF_INET,
-                                                .address = "198.51.100.7",
-                                                .server = "",
+                                                .interfaceName = {},
+                                                .address = "198.51.100.7"_ip,
+                                                .server = {},
                                                 .clientAlive = true,
                                                 .expires = std::nullopt,
                                                 .origin = directory + "/settings"}));
     EXPECT_THAT(facts.places, testing::Contains(WatchedPlace{directory, "settings"}));
-    EXPECT_THAT(facts.complaints, IsEmpty());
+    EXPECT_THAT(facts.diagnostics, IsEmpty());
 }
 
 TEST_F(ConnmanTest, WhatItLeftWhenItEndedProvesNothing) {

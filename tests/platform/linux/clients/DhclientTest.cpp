@@ -19,7 +19,7 @@ std::optional<ClientProcess> parse(std::vector<std::string_view> arguments) {
     return parseDhclientArguments(arguments);
 }
 
-ClientProcess process(std::vector<std::string> interfaces, std::string leaseFile = "",
+ClientProcess process(std::vector<InterfaceName> interfaces, std::string leaseFile = "",
                       bool ipv6 = false) {
     return {.client = Client::Dhclient,
             .interfaces = std::move(interfaces),
@@ -42,7 +42,7 @@ TEST(DhclientArguments, AsIfupdownStartsIt) {
     EXPECT_EQ(parse({"/sbin/dhclient", "-4", "-v", "-i", "-pf", "/run/dhclient.eth1.pid", "-lf",
                      "/var/lib/dhcp/dhclient.eth1.leases", "-I", "-df",
                      "/var/lib/dhcp/dhclient6.eth1.leases", "eth1"}),
-              process({"eth1"}, "/var/lib/dhcp/dhclient.eth1.leases"));
+              process({"eth1"_name}, "/var/lib/dhcp/dhclient.eth1.leases"));
 }
 
 TEST(DhclientArguments, AsNetworkManagerStartsIt) {
@@ -50,14 +50,14 @@ TEST(DhclientArguments, AsNetworkManagerStartsIt) {
                      "/run/NetworkManager/dhclient-eth1.pid", "-lf",
                      "/var/lib/NetworkManager/dhclient-1-eth1.lease", "-cf",
                      "/var/lib/NetworkManager/dhclient-eth1.conf", "eth1"}),
-              process({"eth1"}, "/var/lib/NetworkManager/dhclient-1-eth1.lease"));
+              process({"eth1"_name}, "/var/lib/NetworkManager/dhclient-1-eth1.lease"));
 }
 
 TEST(DhclientArguments, ValuesOfOptionsAreNoInterfaces) {
     EXPECT_EQ(
         parse({"dhclient", "-6", "-e", "A=b", "-s", "192.0.2.1", "-g", "192.0.2.2", "-p", "1068",
                "-D", "LL", "--dad-wait-time", "3", "-H", "host", "-w", "eth1", "eth2"}),
-        process({"eth1", "eth2"}, "", true));
+        process({"eth1"_name, "eth2"_name}, "", true));
 }
 
 TEST(DhclientArguments, AClientThatGivesItsLeaseBackIsNone) {
@@ -81,8 +81,8 @@ class DhclientTest : public testing::Test {
         readDhclient({.files = root_.path()}, facts);
         return facts;
     }
-    static std::vector<std::string> servers(const ClientFacts& facts) {
-        std::vector<std::string> servers;
+    static std::vector<std::optional<IpAddress>> servers(const ClientFacts& facts) {
+        std::vector<std::optional<IpAddress>> servers;
         for (const Lease& lease : facts.leases) {
             servers.push_back(lease.server);
         }
@@ -106,8 +106,8 @@ TEST_F(DhclientTest, FilesOfAllItsStartersAreRead) {
         root_.write(file, lease("eth1", "192.0.2.7", "192.0.2." + std::to_string(number)));
         root_.age(file, number);
     }
-    EXPECT_THAT(servers(read()),
-                ElementsAre("192.0.2.5", "192.0.2.4", "192.0.2.3", "192.0.2.2", "192.0.2.1"));
+    EXPECT_THAT(servers(read()), ElementsAre("192.0.2.5"_ip, "192.0.2.4"_ip, "192.0.2.3"_ip,
+                                             "192.0.2.2"_ip, "192.0.2.1"_ip));
 }
 
 TEST_F(DhclientTest, WhatTheStartFromTheNetworkLeftIsRead) {
@@ -116,7 +116,7 @@ TEST_F(DhclientTest, WhatTheStartFromTheNetworkLeftIsRead) {
     root_.write("/run/initramfs/dhclient.lease", lease("eth1", "192.0.2.7", "192.0.2.3"));
     root_.write("/var/lib/dhcp/net.eth1.lease", lease("eth1", "192.0.2.7", "192.0.2.4"));
     const ClientFacts facts = read();
-    EXPECT_THAT(servers(facts), ElementsAre("192.0.2.1"));
+    EXPECT_THAT(servers(facts), ElementsAre("192.0.2.1"_ip));
     EXPECT_FALSE(facts.leases[0].clientAlive);
 }
 
@@ -132,10 +132,9 @@ TEST_F(DhclientTest, ALeaseBecomesAFullClaim) {
     root_.write("/var/lib/dhcp/dhclient.eth1.leases", sample("isc-dhclient/dhclient.eth1.leases"));
     EXPECT_EQ(read().leases,
               (std::vector<Lease>{{.client = Client::Dhclient,
-                                   .interfaceName = "eth1",
-                                   .family = AF_INET,
-                                   .address = "198.51.100.106",
-                                   .server = "198.51.100.1",
+                                   .interfaceName = "eth1"_name,
+                                   .address = "198.51.100.106"_ip,
+                                   .server = "198.51.100.1"_ip,
                                    .expires = 1795216781,
                                    .origin = root_.path("/var/lib/dhcp/dhclient.eth1.leases")}}));
 }
@@ -145,10 +144,9 @@ TEST_F(DhclientTest, ADhcpv6LeaseBecomesAClaimWithoutAServerAddress) {
                 sample("isc-dhclient/dhclient6.eth1.leases.after-release"));
     EXPECT_EQ(read().leases,
               (std::vector<Lease>{{.client = Client::Dhclient,
-                                   .interfaceName = "eth1",
-                                   .family = AF_INET6,
-                                   .address = "2001:db8:99::16e",
-                                   .server = "",
+                                   .interfaceName = "eth1"_name,
+                                   .address = "2001:db8:99::16e"_ip,
+                                   .server = {},
                                    .released = true,
                                    .expires = 1795217908,
                                    .origin = root_.path("/var/lib/dhcp/dhclient6.eth1.leases")}}));
@@ -162,22 +160,20 @@ TEST_F(DhclientTest, CapturedUnderNetworkManager) {
         root_.age("/var/lib/NetworkManager/" + (name + profile), name[8] == '6' ? 1 : 2);
     }
     const ClientFacts facts =
-        read({process({"eth1"}, "/var/lib/NetworkManager/dhclient-" + profile)});
+        read({process({"eth1"_name}, "/var/lib/NetworkManager/dhclient-" + profile)});
     EXPECT_EQ(facts.leases,
               (std::vector<Lease>{
                   {.client = Client::Dhclient,
-                   .interfaceName = "eth1",
-                   .family = AF_INET,
-                   .address = "198.51.100.109",
-                   .server = "198.51.100.1",
+                   .interfaceName = "eth1"_name,
+                   .address = "198.51.100.109"_ip,
+                   .server = "198.51.100.1"_ip,
                    .clientAlive = true,
                    .expires = 1795216696,
                    .origin = root_.path("/var/lib/NetworkManager/dhclient-" + profile)},
                   {.client = Client::Dhclient,
-                   .interfaceName = "eth1",
-                   .family = AF_INET6,
-                   .address = "2001:db8:99::1b0",
-                   .server = "",
+                   .interfaceName = "eth1"_name,
+                   .address = "2001:db8:99::1b0"_ip,
+                   .server = {},
                    .expires = 1795216697,
                    .origin = root_.path("/var/lib/NetworkManager/dhclient6-" + profile)}}));
 }
@@ -186,10 +182,9 @@ TEST_F(DhclientTest, CapturedUnderIfupdown) {
     root_.write("/var/lib/dhcp/dhclient.eth1.leases", sample("ifupdown/dhclient.eth1.leases"));
     EXPECT_EQ(read().leases,
               (std::vector<Lease>{{.client = Client::Dhclient,
-                                   .interfaceName = "eth1",
-                                   .family = AF_INET,
-                                   .address = "198.51.100.106",
-                                   .server = "198.51.100.1",
+                                   .interfaceName = "eth1"_name,
+                                   .address = "198.51.100.106"_ip,
+                                   .server = "198.51.100.1"_ip,
                                    .expires = 1795216956,
                                    .origin = root_.path("/var/lib/dhcp/dhclient.eth1.leases")}}));
 }
@@ -202,7 +197,7 @@ TEST_F(DhclientTest, AClaimWithoutAnEndIsNone) {
 
 TEST_F(DhclientTest, TheFileOfARunningClientIsReadWhereverItLies) {
     root_.write("/srv/leases/own.db", lease("eth1", "192.0.2.7", "192.0.2.1"));
-    const ClientFacts facts = read({process({"eth1"}, "/srv/leases/own.db")});
+    const ClientFacts facts = read({process({"eth1"_name}, "/srv/leases/own.db")});
     ASSERT_EQ(facts.leases.size(), 1U);
     EXPECT_TRUE(facts.leases[0].clientAlive);
     EXPECT_EQ(facts.places, (std::vector<WatchedPlace>{
@@ -212,7 +207,7 @@ TEST_F(DhclientTest, TheFileOfARunningClientIsReadWhereverItLies) {
 TEST_F(DhclientTest, AFileIsReadOnceHoweverManyNamesItHas) {
     root_.write("/var/lib/dhcp/dhclient.eth1.leases", lease("eth1", "192.0.2.7", "192.0.2.1"));
     ASSERT_EQ(::symlink("dhcp", root_.path("/var/lib/alias").c_str()), 0);
-    const ClientFacts facts = read({process({"eth1"}, "/var/lib/alias/dhclient.eth1.leases")});
+    const ClientFacts facts = read({process({"eth1"_name}, "/var/lib/alias/dhclient.eth1.leases")});
     ASSERT_EQ(facts.leases.size(), 1U);
     EXPECT_TRUE(facts.leases[0].clientAlive);
 }
@@ -229,13 +224,13 @@ TEST_F(DhclientTest, OnlyTheClientThatKeepsTheFileIsBehindItsLeases) {
     };
     EXPECT_THAT(alive({}), ElementsAre(false, false));
     EXPECT_THAT(alive({process({})}), ElementsAre(true, true));
-    EXPECT_THAT(alive({process({"eth2"})}), ElementsAre(false, true));
+    EXPECT_THAT(alive({process({"eth2"_name})}), ElementsAre(false, true));
     EXPECT_THAT(alive({process({}, "/elsewhere")}), ElementsAre(false, false));
     EXPECT_THAT(alive({process({}, "", true)}), ElementsAre(false, false));
 }
 
 TEST_F(DhclientTest, ALeaseFileNamedRelativelyIsNotGuessed) {
-    const ClientFacts facts = read({process({"eth1"}, "own.db")});
+    const ClientFacts facts = read({process({"eth1"_name}, "own.db")});
     EXPECT_THAT(facts.leases, IsEmpty());
     EXPECT_THAT(facts.places, IsEmpty());
 }
@@ -245,7 +240,7 @@ TEST_F(DhclientTest, AnythingButAFileIsReportedAndHangsNobody) {
     ASSERT_EQ(::mkfifo(root_.path("/var/lib/dhcp/dhclient.leases").c_str(), 0600), 0);
     const ClientFacts facts = read();
     EXPECT_THAT(facts.leases, IsEmpty());
-    EXPECT_EQ(facts.complaints.size(), 1U);
+    EXPECT_EQ(facts.diagnostics.size(), 1U);
 }
 
 }  // namespace

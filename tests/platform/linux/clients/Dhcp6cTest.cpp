@@ -23,14 +23,14 @@ TEST(Dhcp6cArguments, Captured) {
     EXPECT_EQ(
         parse({texts.begin(), texts.end()}),
         (ClientProcess{
-            .client = Client::Dhcp6c, .interfaces = {"eth1"}, .leaseFile = "", .ipv6 = true}));
+            .client = Client::Dhcp6c, .interfaces = {"eth1"_name}, .leaseFile = "", .ipv6 = true}));
 }
 
 TEST(Dhcp6cArguments, ItsInterfacesStandBehindTheOptions) {
     EXPECT_EQ(parse({"/usr/sbin/dhcp6c", "-Pdefault", "-p", "/run/dhcp6c.pid", "-c", "conf", "-f",
                      "eth1", "eth2"}),
               (ClientProcess{.client = Client::Dhcp6c,
-                             .interfaces = {"eth1", "eth2"},
+                             .interfaces = {"eth1"_name, "eth2"_name},
                              .leaseFile = "",
                              .ipv6 = true}));
     EXPECT_EQ(parse({}), std::nullopt);

@@ -16,7 +16,7 @@ using testing::IsEmpty;
 std::optional<ClientProcess> parse(std::vector<std::string_view> arguments) {
     return parseDhcpcdArguments(arguments);
 }
-ClientProcess process(std::vector<std::string> interfaces, bool ipv6 = false) {
+ClientProcess process(std::vector<InterfaceName> interfaces, bool ipv6 = false) {
     return {.client = Client::Dhcpcd,
             .interfaces = std::move(interfaces),
             .leaseFile = "",
@@ -24,8 +24,8 @@ ClientProcess process(std::vector<std::string> interfaces, bool ipv6 = false) {
 }
 
 TEST(DhcpcdArguments, ARunningOneSaysWhatItDoes) {
-    EXPECT_EQ(parse({"dhcpcd: eth1 [ip4] [ip6]"}), process({"eth1"}));
-    EXPECT_EQ(parse({"dhcpcd: eth1 [ip6]"}), process({"eth1"}, true));
+    EXPECT_EQ(parse({"dhcpcd: eth1 [ip4] [ip6]"}), process({"eth1"_name}));
+    EXPECT_EQ(parse({"dhcpcd: eth1 [ip6]"}), process({"eth1"_name}, true));
     EXPECT_EQ(parse({"dhcpcd: [manager] [ip4] [ip6]"}), process({}));
     EXPECT_EQ(parse({"dhcpcd: [master] [ip4]"}), process({}));
 }
@@ -41,8 +41,8 @@ TEST(DhcpcdArguments, ItsHelpersAreNoClients) {
 TEST(DhcpcdArguments, BeforeItSaysSoItsArgumentsTell) {
     EXPECT_EQ(parse({"dhcpcd"}), process({}));
     EXPECT_EQ(parse({"/usr/sbin/dhcpcd", "-q", "-t", "30", "--config", "/c", "-Bd", "eth1"}),
-              process({"eth1"}));
-    EXPECT_EQ(parse({"dhcpcd", "-6", "eth1", "eth2"}), process({"eth1", "eth2"}, true));
+              process({"eth1"_name}));
+    EXPECT_EQ(parse({"dhcpcd", "-6", "eth1", "eth2"}), process({"eth1"_name, "eth2"_name}, true));
     EXPECT_EQ(parse({}), std::nullopt);
 }
 
@@ -53,10 +53,11 @@ TEST(DhcpcdArguments, ACommandToAnotherOneIsNoClient) {
 }
 
 TEST(DhcpcdInterfaces, ANetworksNameMayStandBehindTheInterface) {
-    EXPECT_THAT(dhcpcdInterfaces("eth1"), ElementsAre("eth1"));
-    EXPECT_THAT(dhcpcdInterfaces("wlan0-My-Net"), ElementsAre("wlan0-My-Net", "wlan0-My", "wlan0"));
-    EXPECT_THAT(dhcpcdInterfaces("wlan0-A network of a long name"), ElementsAre("wlan0"));
-    EXPECT_THAT(dhcpcdInterfaces("-"), ElementsAre("-"));
+    EXPECT_THAT(dhcpcdInterfaces("eth1"), ElementsAre("eth1"_name));
+    EXPECT_THAT(dhcpcdInterfaces("wlan0-My-Net"),
+                ElementsAre("wlan0-My-Net"_name, "wlan0-My"_name, "wlan0"_name));
+    EXPECT_THAT(dhcpcdInterfaces("wlan0-A network of a long name"), ElementsAre("wlan0"_name));
+    EXPECT_THAT(dhcpcdInterfaces("-"), ElementsAre("-"_name));
     EXPECT_THAT(dhcpcdInterfaces(""), IsEmpty());
 }
 
@@ -73,10 +74,9 @@ class DhcpcdTest : public testing::Test {
     }
     [[nodiscard]] Lease lease(const std::string& file) const {
         return {.client = Client::Dhcpcd,
-                .interfaceName = "eth1",
-                .family = AF_INET,
-                .address = "198.51.100.121",
-                .server = "198.51.100.1",
+                .interfaceName = "eth1"_name,
+                .address = "198.51.100.121"_ip,
+                .server = "198.51.100.1"_ip,
                 .expires = 1'795'216'600,
                 .origin = root_.path(file)};
     }
@@ -97,10 +97,9 @@ TEST_F(DhcpcdTest, ALeaseOfIPv6NamesNoServer) {
     write("/var/lib/dhcpcd/eth1.lease6", sample("dhcpcd-10/eth1.lease6"));
     EXPECT_THAT(read().leases,
                 ElementsAre(Lease{.client = Client::Dhcpcd,
-                                  .interfaceName = "eth1",
-                                  .family = AF_INET6,
-                                  .address = "2001:db8:99::100",
-                                  .server = "",
+                                  .interfaceName = "eth1"_name,
+                                  .address = "2001:db8:99::100"_ip,
+                                  .server = {},
                                   .expires = 1'795'216'600,
                                   .origin = root_.path("/var/lib/dhcpcd/eth1.lease6")}));
 }
@@ -115,7 +114,7 @@ TEST_F(DhcpcdTest, AllItsPlacesAreRead) {
     EXPECT_THAT(read().leases, ElementsAre(lease("/var/lib/dhcpcd/eth1.lease"),
                                            lease("/var/lib/dhcpcd5/dhcpcd-eth1.lease"),
                                            lease("/var/db/dhcpcd/eth1.lease")));
-    EXPECT_THAT(read().complaints, IsEmpty());
+    EXPECT_THAT(read().diagnostics, IsEmpty());
 }
 
 TEST_F(DhcpcdTest, ARunningOneOfTheLinkOrOfAllKeepsTheLease) {
@@ -123,9 +122,9 @@ TEST_F(DhcpcdTest, ARunningOneOfTheLinkOrOfAllKeepsTheLease) {
     const auto alive = [&](const ClientProcess& process) {
         return read({process}).leases.at(0).clientAlive;
     };
-    EXPECT_TRUE(alive(process({"eth1"})));
+    EXPECT_TRUE(alive(process({"eth1"_name})));
     EXPECT_TRUE(alive(process({})));
-    EXPECT_FALSE(alive(process({"eth2"})));
+    EXPECT_FALSE(alive(process({"eth2"_name})));
     ClientProcess other = process({});
     other.client = Client::Dhclient;
     EXPECT_FALSE(alive(other));
@@ -142,7 +141,7 @@ TEST_F(DhcpcdTest, AnInfiniteLeaseAndBootpHaveNoEnd) {
     write("/var/lib/dhcpcd/eth1.lease", bootp);
     EXPECT_EQ(read().leases.at(0).expires, Lease::never);
     EXPECT_TRUE(read().leases.at(0).bootp);
-    EXPECT_EQ(read().leases.at(0).server, "");
+    EXPECT_EQ(read().leases.at(0).server, std::nullopt);
 }
 
 TEST_F(DhcpcdTest, AReplyWithoutALeaseTimeIsNoLease) {
@@ -150,7 +149,7 @@ TEST_F(DhcpcdTest, AReplyWithoutALeaseTimeIsNoLease) {
         sample("dhcpcd-10/eth1.lease").substr(0, 240) + std::string{"\x35\x01\x05\xff"};
     write("/var/lib/dhcpcd/eth1.lease", inform);
     EXPECT_THAT(read().leases, IsEmpty());
-    EXPECT_THAT(read().complaints, IsEmpty());
+    EXPECT_THAT(read().diagnostics, IsEmpty());
 }
 
 TEST_F(DhcpcdTest, AnEmptyFileIsJustBeingWritten) {
@@ -162,7 +161,7 @@ TEST_F(DhcpcdTest, AFileThatIsNoPacketIsReported) {
     write("/var/lib/dhcpcd/eth1.lease", "text");
     write("/var/lib/dhcpcd/eth1.lease6", "text");
     EXPECT_THAT(read().leases, IsEmpty());
-    EXPECT_THAT(read().complaints,
+    EXPECT_THAT(read().diagnostics,
                 ElementsAre("cannot use " + root_.path("/var/lib/dhcpcd/eth1.lease") +
                                 ": shorter than a DHCP message",
                             HasSubstr("not a reply of a server")));
@@ -170,11 +169,11 @@ TEST_F(DhcpcdTest, AFileThatIsNoPacketIsReported) {
 
 TEST_F(DhcpcdTest, AWirelessLeaseIsClaimedForEachPossibleInterface) {
     write("/var/lib/dhcpcd/wlan0-Net.lease", sample("dhcpcd-10/eth1.lease"));
-    std::vector<std::string> names;
+    std::vector<std::optional<InterfaceName>> names;
     for (const Lease& found : read().leases) {
         names.push_back(found.interfaceName);
     }
-    EXPECT_THAT(names, ElementsAre("wlan0-Net", "wlan0"));
+    EXPECT_THAT(names, ElementsAre("wlan0-Net"_name, "wlan0"_name));
 }
 
 }  // namespace

@@ -15,19 +15,19 @@ using testing::IsEmpty;
 
 TEST(IpconfigResult, CapturedDhcp) {
     EXPECT_EQ(parseIpconfig(sample("klibc-ipconfig/run-net-eth1.conf.dhcp")),
-              (IpconfigResult{.interfaceName = "eth1",
+              (IpconfigResult{.interfaceName = "eth1"_name,
                               .protocol = Protocol::Dhcp,
-                              .address = "203.0.113.140",
-                              .server = "203.0.113.1",
+                              .address = "203.0.113.140"_ip,
+                              .server = "203.0.113.1"_ip,
                               .leaseTime = 1200}));
 }
 
 TEST(IpconfigResult, CapturedBootp) {
     EXPECT_EQ(parseIpconfig(sample("klibc-ipconfig/run-net-eth1.conf.bootp")),
-              (IpconfigResult{.interfaceName = "eth1",
+              (IpconfigResult{.interfaceName = "eth1"_name,
                               .protocol = Protocol::Bootp,
-                              .address = "203.0.113.140",
-                              .server = "203.0.113.1",
+                              .address = "203.0.113.140"_ip,
+                              .server = "203.0.113.1"_ip,
                               .leaseTime = 0}));
 }
 
@@ -38,8 +38,8 @@ TEST(IpconfigResult, NewerVersionsCallTheProtocolOtherwise) {
 
 TEST(IpconfigResult, AllZerosAreNoAddress) {
     const IpconfigResult result = parseIpconfig("IPV4ADDR='0.0.0.0'\nROOTSERVER='0.0.0.0'\n");
-    EXPECT_EQ(result.address, "");
-    EXPECT_EQ(result.server, "");
+    EXPECT_EQ(result.address, std::nullopt);
+    EXPECT_EQ(result.server, std::nullopt);
 }
 
 class IpconfigTest : public testing::Test {
@@ -51,10 +51,9 @@ class IpconfigTest : public testing::Test {
     }
     [[nodiscard]] Lease lease(bool bootp, std::int64_t expires) const {
         return {.client = Client::Ipconfig,
-                .interfaceName = "eth1",
-                .family = AF_INET,
-                .address = "203.0.113.140",
-                .server = "203.0.113.1",
+                .interfaceName = "eth1"_name,
+                .address = "203.0.113.140"_ip,
+                .server = "203.0.113.1"_ip,
                 .bootp = bootp,
                 .expires = expires,
                 .outlivesEnd = true,

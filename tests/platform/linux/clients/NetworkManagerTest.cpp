@@ -19,8 +19,8 @@ NetworkManagerDevice device(std::int64_t expires) {
             .profile = uuid,
             .dhcp4 = true,
             .dhcp6 = true,
-            .address4 = "198.51.100.109",
-            .server4 = "198.51.100.1",
+            .address4 = "198.51.100.109"_ip,
+            .server4 = "198.51.100.1"_ip,
             .expires4 = expires};
 }
 
@@ -32,7 +32,7 @@ TEST(NetworkManagerDevice, CapturedByVersion142) {
 
 TEST(NetworkManagerDevice, CapturedByVersion152) {
     NetworkManagerDevice expected = device(1'795'217'223);
-    expected.address4 = "198.51.100.112";
+    expected.address4 = "198.51.100.112"_ip;
     EXPECT_EQ(parseNetworkManagerDevice(
                   sample("networkmanager-1.52-internal/run-NetworkManager-devices-2.txt")),
               expected);
@@ -53,9 +53,9 @@ TEST(NetworkManagerDevice, CapturedInfiniteLeaseHasNoExpiry) {
 TEST(NetworkManagerDevice, WithoutASectionThereIsNoLease) {
     EXPECT_EQ(
         parseNetworkManagerDevice("[device]\nmanaged=true\n"),
-        (NetworkManagerDevice{.managed = true, .profile = "", .address4 = "", .server4 = ""}));
+        (NetworkManagerDevice{.managed = true, .profile = "", .address4 = {}, .server4 = {}}));
     EXPECT_EQ(parseNetworkManagerDevice(""),
-              (NetworkManagerDevice{.profile = "", .address4 = "", .server4 = ""}));
+              (NetworkManagerDevice{.profile = "", .address4 = {}, .server4 = {}}));
     EXPECT_FALSE(parseNetworkManagerDevice("[device]\nmanaged=unknown\n").managed);
 }
 
@@ -66,7 +66,7 @@ TEST(NetworkManagerDevice, ATimeThatCannotBeReadIsOver) {
 TEST(NetworkManagerProfile, Captured) {
     EXPECT_EQ(parseNetworkManagerProfile(sample("networkmanager-internal/eth1.nmconnection")),
               (NetworkManagerProfile{.uuid = uuid,
-                                     .interfaceName = "eth1",
+                                     .interfaceName = "eth1"_name,
                                      .method4 = "auto",
                                      .method6 = "auto",
                                      .addresses4 = {}}));
@@ -75,7 +75,7 @@ TEST(NetworkManagerProfile, Captured) {
 TEST(NetworkManagerProfile, CapturedFromNetplan) {
     EXPECT_EQ(parseNetworkManagerProfile(sample("netplan/netplan-eth2.nmconnection")),
               (NetworkManagerProfile{.uuid = "",
-                                     .interfaceName = "eth2",
+                                     .interfaceName = "eth2"_name,
                                      .method4 = "auto",
                                      .method6 = "ignore",
                                      .addresses4 = {}}));
@@ -88,13 +88,13 @@ TEST(NetworkManagerProfile, AddressesStandInSeveralKeys) {
                                    "address-data=192.0.2.9\naddress3=x\n"
                                    "[ipv6]\naddress1=2001:db8::1/64\n")
             .addresses4,
-        ElementsAre("192.0.2.1", "192.0.2.2", "192.0.2.3", "192.0.2.4"));
+        ElementsAre("192.0.2.1"_ip, "192.0.2.2"_ip, "192.0.2.3"_ip, "192.0.2.4"_ip));
 }
 
 TEST(InternalLease, TheInterfaceStandsBehindTheProfile) {
     const std::string prefix = std::string{"internal-"} + uuid;
-    EXPECT_EQ(internalLeaseInterface(prefix + "-eth1.lease"), "eth1");
-    EXPECT_EQ(internalLeaseInterface(prefix + "-a-b.lease"), "a-b");
+    EXPECT_EQ(internalLeaseInterface(prefix + "-eth1.lease"), "eth1"_name);
+    EXPECT_EQ(internalLeaseInterface(prefix + "-a-b.lease"), "a-b"_name);
     for (const std::string& name :
          {prefix + ".lease", prefix + "-.lease", prefix + "-eth1.txt", prefix + "xeth1.lease",
           std::string{"internal-eth1.lease"}, std::string{"dhclient-eth1.lease"}}) {
@@ -131,11 +131,10 @@ TEST_F(NetworkManagerTest, CapturedStateWhileItRuns) {
     root_.write(profile, sample("networkmanager-internal/eth1.nmconnection"));
     const ClientFacts facts = read();
     EXPECT_THAT(facts.leases, ElementsAre(Lease{.client = Client::NetworkManager,
-                                                .interfaceName = "",
+                                                .interfaceName = {},
                                                 .ifindex = 2,
-                                                .family = AF_INET,
-                                                .address = "198.51.100.109",
-                                                .server = "198.51.100.1",
+                                                .address = "198.51.100.109"_ip,
+                                                .server = "198.51.100.1"_ip,
                                                 .clientAlive = true,
                                                 .expires = 1'795'216'616,
                                                 .origin = root_.path(state)}));
@@ -147,7 +146,7 @@ TEST_F(NetworkManagerTest, CapturedStateWhileItRuns) {
                                .origin = root_.path(profile)};
     EXPECT_THAT(facts.managements, ElementsAre(expected));
     expected.ifindex = 0;
-    expected.interfaceName = "eth1";
+    expected.interfaceName = "eth1"_name;
     expected.dhcp6 = std::nullopt;  // of "auto" the routers decide
     EXPECT_THAT(facts.configurations, ElementsAre(expected));
 }
@@ -180,7 +179,7 @@ TEST_F(NetworkManagerTest, TheMethodOfTheActiveProfileTells) {
         writeDevice();
         writeProfile("method=" + method + "\naddress1=192.0.2.1/24");
         LinkConfiguration found = read().managements.at(0);
-        EXPECT_THAT(found.staticAddresses, ElementsAre("192.0.2.1")) << method;
+        EXPECT_THAT(found.staticAddresses, ElementsAre("192.0.2.1"_ip)) << method;
         return found;
     };
     EXPECT_EQ(management("auto").dhcp4, true);
@@ -214,10 +213,9 @@ TEST_F(NetworkManagerTest, AWholeLeaseFileOfOlderVersionsIsALease) {
     root_.write(file, "ADDRESS=192.0.2.7\nSERVER_ADDRESS=192.0.2.1\nLIFETIME=600\n");
     root_.age(file, 1'000'000);
     EXPECT_THAT(read().leases, ElementsAre(Lease{.client = Client::NetworkManager,
-                                                 .interfaceName = "eth1",
-                                                 .family = AF_INET,
-                                                 .address = "192.0.2.7",
-                                                 .server = "192.0.2.1",
+                                                 .interfaceName = "eth1"_name,
+                                                 .address = "192.0.2.7"_ip,
+                                                 .server = "192.0.2.1"_ip,
                                                  .expires = 1'000'600,
                                                  .origin = root_.path(file)}));
 }

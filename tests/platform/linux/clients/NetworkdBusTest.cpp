@@ -26,45 +26,41 @@ std::vector<NetworkdAddress> parse(const std::string& json) {
     return facts == nullptr ? std::vector<NetworkdAddress>{} : *facts;
 }
 
-NetworkdAddress address(std::uint8_t family, const std::string& text, const std::string& source,
-                        const std::string& provider = "", std::uint32_t ifindex = 2) {
-    return {.ifindex = ifindex,
-            .family = family,
-            .address = text,
-            .source = source,
-            .provider = provider};
+NetworkdAddress address(const IpAddress& own, const std::string& source,
+                        const std::optional<IpAddress>& provider = {}, std::uint32_t ifindex = 2) {
+    return {.ifindex = ifindex, .address = own, .source = source, .provider = provider};
 }
 
 TEST(NetworkdDescription, CapturedByVersion252) {
     EXPECT_THAT(
         parse(sample("networkd/networkctl-status-eth1.json")),
-        ElementsAre(address(AF_INET6, "fe80::5054:ff:fe00:5", "foreign"),
-                    address(AF_INET, "198.51.100.110", "DHCPv4", "198.51.100.1"),
-                    address(AF_INET6, "2001:db8:99::1b2", "DHCPv6", "fe80::e0cb:10ff:feee:2799")));
+        ElementsAre(address("fe80::5054:ff:fe00:5"_ip, "foreign"),
+                    address("198.51.100.110"_ip, "DHCPv4", "198.51.100.1"_ip),
+                    address("2001:db8:99::1b2"_ip, "DHCPv6", "fe80::e0cb:10ff:feee:2799"_ip)));
 }
 
 TEST(NetworkdDescription, CapturedByVersion257) {
     EXPECT_THAT(
         parse(sample("networkd-257/networkctl-status-eth1.json")),
-        ElementsAre(address(AF_INET6, "2001:db8:99::1d3", "DHCPv6", "fe80::e0cb:10ff:feee:2799"),
-                    address(AF_INET6, "fe80::5054:ff:fe00:6", "foreign"),
-                    address(AF_INET, "198.51.100.111", "DHCPv4", "198.51.100.1")));
+        ElementsAre(address("2001:db8:99::1d3"_ip, "DHCPv6", "fe80::e0cb:10ff:feee:2799"_ip),
+                    address("fe80::5054:ff:fe00:6"_ip, "foreign"),
+                    address("198.51.100.111"_ip, "DHCPv4", "198.51.100.1"_ip)));
 }
 
 TEST(NetworkdDescription, CapturedStaticAndLinkLocal) {
     EXPECT_THAT(parse(sample("networkd/networkctl-static-linklocal.json")),
-                ElementsAre(address(AF_INET6, "fe80::c452:2fff:fee3:97d", "foreign", "", 3),
-                            address(AF_INET, "169.254.105.80", "IPv4LL", "", 3),
-                            address(AF_INET, "198.51.100.30", "static", "", 3)));
+                ElementsAre(address("fe80::c452:2fff:fee3:97d"_ip, "foreign", {}, 3),
+                            address("169.254.105.80"_ip, "IPv4LL", {}, 3),
+                            address("198.51.100.30"_ip, "static", {}, 3)));
 }
 
 TEST(NetworkdDescription, OfAllLinksAtOnce) {
-    EXPECT_THAT(parse(R"({"Interfaces":[
+    EXPECT_THAT(
+        parse(R"({"Interfaces":[
         {"Index":1,"Addresses":[{"Family":2,"Address":[127,0,0,1],"ConfigSource":"foreign"}]},
         {"Index":7},
         {"Index":2,"Addresses":[{"Family":2,"Address":[192,0,2,7],"ConfigSource":"static"}]}]})"),
-                ElementsAre(address(AF_INET, "127.0.0.1", "foreign", "", 1),
-                            address(AF_INET, "192.0.2.7", "static")));
+        ElementsAre(address("127.0.0.1"_ip, "foreign", {}, 1), address("192.0.2.7"_ip, "static")));
 }
 
 TEST(NetworkdDescription, WhatIsNoAddressIsSkipped) {
@@ -73,7 +69,7 @@ TEST(NetworkdDescription, WhatIsNoAddressIsSkipped) {
         {"Family":2,"Address":[1,2,3,-4]},{"Family":10,"Address":[1,2,3,4]},
         {"Family":300,"Address":[1,2,3,4]},{"Family":"2","Address":[1,2,3,4]},
         {"Family":2,"Address":[192,0,2,7],"ConfigSource":7,"ConfigProvider":[1]}]})"),
-                ElementsAre(address(AF_INET, "192.0.2.7", "")));
+                ElementsAre(address("192.0.2.7"_ip, "")));
     EXPECT_THAT(parse("{}"), IsEmpty());
     EXPECT_THAT(parse(R"({"Index":-2,"Addresses":[]})"), IsEmpty());
     EXPECT_THAT(parse(R"({"Index":2,"Addresses":{}})"), IsEmpty());
@@ -89,20 +85,18 @@ TEST(NetworkdDescription, OtherTextsHaveAReason) {
 TEST(AddNetworkdDescription, AddsLeasesThatTheFilesDoNotTell) {
     ClientFacts facts;
     facts.leases = {{.client = Client::Networkd,
-                     .interfaceName = "",
+                     .interfaceName = {},
                      .ifindex = 2,
-                     .family = AF_INET,
-                     .address = "198.51.100.110",
-                     .server = "198.51.100.1",
+                     .address = "198.51.100.110"_ip,
+                     .server = "198.51.100.1"_ip,
                      .expires = {},
                      .origin = "the file"}};
     const std::vector<Lease> expected{facts.leases[0],
                                       {.client = Client::Networkd,
-                                       .interfaceName = "",
+                                       .interfaceName = {},
                                        .ifindex = 2,
-                                       .family = AF_INET6,
-                                       .address = "2001:db8:99::1b2",
-                                       .server = "fe80::e0cb:10ff:feee:2799",
+                                       .address = "2001:db8:99::1b2"_ip,
+                                       .server = "fe80::e0cb:10ff:feee:2799"_ip,
                                        .clientAlive = true,
                                        .expires = {},
                                        .origin = "D-Bus org.freedesktop.network1"}};
@@ -120,7 +114,7 @@ TEST(AddNetworkdDescription, AddsAddressesThatAreStaticOnce) {
     const auto described = parse(sample("networkd/networkctl-static-linklocal.json"));
     addNetworkdDescription(described, facts);
     addNetworkdDescription(described, facts);
-    EXPECT_THAT(facts.managements[0].staticAddresses, ElementsAre("198.51.100.30"));
+    EXPECT_THAT(facts.managements[0].staticAddresses, ElementsAre("198.51.100.30"_ip));
     EXPECT_THAT(facts.leases, IsEmpty());
 }
 
@@ -130,7 +124,7 @@ std::string answerOf(const std::string& bus, std::chrono::milliseconds time) {
     const auto result = inChild([&] {
         ::setenv("DBUS_SYSTEM_BUS_ADDRESS", bus.c_str(), 1);
         const auto start = std::chrono::steady_clock::now();
-        const NetworkdAnswer answer = askNetworkd(start + time);
+        const NetworkdResponse answer = askNetworkd(start + time);
         const bool late = std::chrono::steady_clock::now() - start > std::chrono::seconds{5};
         return answer.json + '|' + answer.reason + (late ? " (late)" : "");
     });

@@ -47,7 +47,7 @@ TEST_F(ProcessesTest, AClientIsFoundByItsName) {
     add("18", "dhclientx", commandLine_);
     add("19", "sh", commandLine_);
     EXPECT_THAT(read().processes, ElementsAre(ClientProcess{.client = Client::Dhclient,
-                                                            .interfaces = {"eth1"},
+                                                            .interfaces = {"eth1"_name},
                                                             .leaseFile = "/l",
                                                             .ipv6 = false,
                                                             .pid = 17}));
@@ -61,7 +61,7 @@ TEST_F(ProcessesTest, ClientsOfOtherNamespacesConcernOtherLinks) {
 TEST_F(ProcessesTest, AClientOfAnUnknownNamespaceIsNotTrusted) {
     add("17", "dhclient", commandLine_, nullptr);
     EXPECT_THAT(read().processes, IsEmpty());
-    EXPECT_THAT(read().complaints, IsEmpty());
+    EXPECT_THAT(read().diagnostics, IsEmpty());
 }
 
 TEST_F(ProcessesTest, WithoutAnOwnNamespaceNobodyIsTrusted) {
@@ -85,15 +85,15 @@ TEST_F(ProcessesTest, EachClientIsKnownByItsName) {
     add("14", "udhcpc6", text("udhcpc6\0-i\0eth4\0", 16));
     add("15", "dhcp6c", text("dhcp6c\0eth5\0", 12));
     add("16", "busybox", text("busybox\0sh\0", 11));
-    std::vector<std::tuple<Client, std::string, std::int32_t>> found;
+    std::vector<std::tuple<Client, InterfaceName, std::int32_t>> found;
     for (const ClientProcess& process : read().processes) {
         found.emplace_back(process.client, process.interfaces.at(0), process.pid);
     }
-    EXPECT_THAT(found, testing::UnorderedElementsAre(std::tuple{Client::Dhcpcd, "eth1", 11},
-                                                     std::tuple{Client::Udhcpc, "eth2", 12},
-                                                     std::tuple{Client::Udhcpc, "eth3", 13},
-                                                     std::tuple{Client::Udhcpc, "eth4", 14},
-                                                     std::tuple{Client::Dhcp6c, "eth5", 15}));
+    EXPECT_THAT(found, testing::UnorderedElementsAre(std::tuple{Client::Dhcpcd, "eth1"_name, 11},
+                                                     std::tuple{Client::Udhcpc, "eth2"_name, 12},
+                                                     std::tuple{Client::Udhcpc, "eth3"_name, 13},
+                                                     std::tuple{Client::Udhcpc, "eth4"_name, 14},
+                                                     std::tuple{Client::Dhcp6c, "eth5"_name, 15}));
 }
 
 TEST_F(ProcessesTest, ManagersAreToldWithWhereTheyRun) {
@@ -127,8 +127,8 @@ TEST_F(ProcessesTest, AClientWhoseNamespaceIsForbiddenIsReported) {
         }
         const ClientFacts facts = read();
         std::string text = std::to_string(facts.processes.size()) + " processes";
-        for (const std::string& complaint : facts.complaints) {
-            text += "; " + complaint;
+        for (const std::string& diagnostic : facts.diagnostics) {
+            text += "; " + diagnostic;
         }
         return text;
     });
@@ -186,7 +186,7 @@ TEST_F(ProcessesTest, AnyListOfThreadsOfTheKernelIsRead) {
 TEST_F(ProcessesTest, WithoutAProcessFileSystemThereIsAReason) {
     ClientFacts facts;
     readProcesses({.files = "", .proc = proc_.path("/none")}, facts);
-    EXPECT_THAT(facts.complaints,
+    EXPECT_THAT(facts.diagnostics,
                 ElementsAre("cannot read " + proc_.path("/none") + ": No such file or directory"));
 }
 

@@ -18,7 +18,10 @@ std::optional<ClientProcess> parse(std::vector<std::string_view> arguments) {
     return parseUdhcpcArguments(arguments);
 }
 ClientProcess process(const std::string& interface, bool ipv6 = false) {
-    return {.client = Client::Udhcpc, .interfaces = {interface}, .leaseFile = "", .ipv6 = ipv6};
+    return {.client = Client::Udhcpc,
+            .interfaces = {interfaceName(interface)},
+            .leaseFile = "",
+            .ipv6 = ipv6};
 }
 
 TEST(UdhcpcArguments, Captured) {
@@ -79,10 +82,9 @@ TEST_F(UdhcpcTest, WhatAScriptIsGivenTellsTheLease) {
     write(events.substr(events.find("== bound")));
     EXPECT_THAT(read({process("eth1")}).leases,
                 ElementsAre(Lease{.client = Client::Udhcpc,
-                                  .interfaceName = "eth1",
-                                  .family = AF_INET,
-                                  .address = "198.51.100.108",
-                                  .server = "198.51.100.1",
+                                  .interfaceName = "eth1"_name,
+                                  .address = "198.51.100.108"_ip,
+                                  .server = "198.51.100.1"_ip,
                                   .clientAlive = true,
                                   .expires = 1'000'600,
                                   .origin = root_.path("/run/udhcpc.eth1.state")}));
@@ -93,7 +95,7 @@ TEST_F(UdhcpcTest, WhatAScriptIsGivenTellsTheLease) {
 TEST_F(UdhcpcTest, AnInfiniteLeaseNeverEnds) {
     write("ip=192.0.2.7\nlease=4294967295\n");
     EXPECT_EQ(read().leases.at(0).expires, Lease::never);
-    EXPECT_EQ(read().leases.at(0).server, "");
+    EXPECT_EQ(read().leases.at(0).server, std::nullopt);
 }
 
 TEST_F(UdhcpcTest, AnIncompleteFileIsNoLease) {

@@ -73,12 +73,12 @@ WickedLease parse(const std::string& xml) {
 TEST(WickedLease, OfIPv4) {
     EXPECT_EQ(
         parse(lease4),
-        (WickedLease{
-            .family = AF_INET,
-            .type = "dhcp",
-            .state = "granted",
-            .server = "198.51.100.1",
-            .addresses = {{.address = "198.51.100.7", .acquired = 1'000'000, .lifetime = 600}}}));
+        (WickedLease{.family = AF_INET,
+                     .type = "dhcp",
+                     .state = "granted",
+                     .server = "198.51.100.1"_ip,
+                     .addresses = {
+                         {.address = "198.51.100.7"_ip, .acquired = 1'000'000, .lifetime = 600}}}));
 }
 
 TEST(WickedLease, OfIPv6NamesTheSenderOfTheServersMessages) {
@@ -88,8 +88,8 @@ TEST(WickedLease, OfIPv6NamesTheSenderOfTheServersMessages) {
             .family = AF_INET6,
             .type = "dhcp",
             .state = "granted",
-            .server = "fe80::1",
-            .addresses = {{.address = "2001:db8::7", .acquired = 1'000'050, .lifetime = 600}}}));
+            .server = "fe80::1"_ip,
+            .addresses = {{.address = "2001:db8::7"_ip, .acquired = 1'000'050, .lifetime = 600}}}));
 }
 
 TEST(WickedLease, EveryBeginningIsTornOrEmpty) {
@@ -104,7 +104,7 @@ TEST(WickedLease, EveryBeginningIsTornOrEmpty) {
 }
 
 TEST(WickedLease, OtherTextsGiveAReasonOrNothing) {
-    EXPECT_EQ(parse(""), (WickedLease{.type = "", .state = "", .server = "", .addresses = {}}));
+    EXPECT_EQ(parse(""), (WickedLease{.type = "", .state = "", .server = {}, .addresses = {}}));
     EXPECT_EQ(parse("text").addresses.size(), 0U);
     for (const char* text : {"<lease>", "<lease", "</lease>", "<a></b>", "<!-- <a>"}) {
         EXPECT_TRUE(std::holds_alternative<std::string_view>(parseWickedLease(text))) << text;
@@ -130,10 +130,9 @@ class WickedTest : public testing::Test {
 TEST_F(WickedTest, ALeaseIsTheFilesInterfacesOwn) {
     root_.write(file, lease4);
     Lease expected{.client = Client::Wicked,
-                   .interfaceName = "eth1",
-                   .family = AF_INET,
-                   .address = "198.51.100.7",
-                   .server = "198.51.100.1",
+                   .interfaceName = "eth1"_name,
+                   .address = "198.51.100.7"_ip,
+                   .server = "198.51.100.1"_ip,
                    .expires = 1'000'600,
                    .origin = root_.path(file)};
     EXPECT_THAT(read().leases, ElementsAre(expected));
@@ -145,10 +144,9 @@ TEST_F(WickedTest, BothPlacesAndProtocolsAreRead) {
     root_.write("/run/wicked/lease-a-b-dhcp-ipv6.xml", lease6);
     EXPECT_THAT(read().leases,
                 ElementsAre(Lease{.client = Client::Wicked,
-                                  .interfaceName = "a-b",
-                                  .family = AF_INET6,
-                                  .address = "2001:db8::7",
-                                  .server = "fe80::1",
+                                  .interfaceName = "a-b"_name,
+                                  .address = "2001:db8::7"_ip,
+                                  .server = "fe80::1"_ip,
                                   .expires = 1'000'650,
                                   .origin = root_.path("/run/wicked/lease-a-b-dhcp-ipv6.xml")}));
 }
@@ -171,7 +169,7 @@ TEST_F(WickedTest, ATornFileIsReportedAndOthersAreNotLookedAt) {
     root_.write("/var/lib/wicked/lease--dhcp-ipv4.xml", lease4);
     root_.write("/var/lib/wicked/duid.xml", lease4);
     EXPECT_THAT(read().leases, IsEmpty());
-    EXPECT_THAT(read().complaints, ElementsAre(HasSubstr("the file ends within an element")));
+    EXPECT_THAT(read().diagnostics, ElementsAre(HasSubstr("the file ends within an element")));
 }
 
 }  // namespace

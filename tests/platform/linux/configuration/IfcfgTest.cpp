@@ -25,7 +25,7 @@ TEST(IfcfgFile, AddressesMayBeNumberedOrNamed) {
     EXPECT_THAT(parseIfcfg("IPADDR=192.0.2.1\nIPADDR0='192.0.2.2/24'\nIPADDR_office=192.0.2.3\n"
                            "IPADDRS=192.0.2.9\nIPADDR1=x\n")
                     .addresses,
-                ElementsAre("192.0.2.1", "192.0.2.2", "192.0.2.3"));
+                ElementsAre("192.0.2.1"_ip, "192.0.2.2"_ip, "192.0.2.3"_ip));
 }
 
 TEST(IfcfgNames, WhatEditorsAndPackagesLeaveDoesNotCount) {
@@ -47,7 +47,7 @@ class IfcfgTest : public testing::Test {
     }
     [[nodiscard]] LinkConfiguration configuration(std::optional<bool> dhcp4) const {
         return {.client = Client::Ifcfg,
-                .interfaceName = "eth1",
+                .interfaceName = "eth1"_name,
                 .dhcp4 = dhcp4,
                 .dhcp6 = {},
                 .staticAddresses = {},
@@ -93,14 +93,14 @@ TEST_F(IfcfgTest, WithoutAProtocolOnlyAnAddressTells) {
     EXPECT_THAT(read(), ElementsAre(configuration(std::nullopt)));
     root_.write(file, "DEVICE=eth1\nIPADDR=192.0.2.1\n");
     LinkConfiguration fixed = configuration(false);
-    fixed.staticAddresses = {"192.0.2.1"};
+    fixed.staticAddresses = {"192.0.2.1"_ip};
     EXPECT_THAT(read(), ElementsAre(fixed));
 }
 
 TEST_F(IfcfgTest, WithoutADeviceTheNameOfTheFileIsIt) {
     root_.write("/etc/sysconfig/network/ifcfg-eth7", "BOOTPROTO='dhcp'\n");
     ASSERT_EQ(read().size(), 1U);
-    EXPECT_EQ(read()[0].interfaceName, "eth7");
+    EXPECT_EQ(read()[0].interfaceName, "eth7"_name);
 }
 
 TEST_F(IfcfgTest, OneThatIsNamedByItsHardwareIsNotGuessed) {

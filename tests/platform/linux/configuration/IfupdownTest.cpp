@@ -41,7 +41,7 @@ TEST(InterfacesFile, CommentsContinuationsAndOtherStanzas) {
         "iface eth2 inet6 static\n    address 2001:db8::1/64\n"
         "source /etc/network/interfaces.d/*\nsource-directory more\nsource\n");
     IfaceStanza first = stanza("eth1", "inet", "static");
-    first.addresses = {"192.0.2.1"};
+    first.addresses = {"192.0.2.1"_ip};
     EXPECT_EQ(file, (InterfacesFile{.stanzas = {first, stanza("eth2", "inet6", "static")},
                                     .sources = {"/etc/network/interfaces.d/*"},
                                     .directories = {"more"}}));
@@ -55,9 +55,9 @@ TEST(InterfacesFile, AnyTextGivesFacts) {
 
 TEST(Ifstate, Captured) {
     EXPECT_THAT(parseIfstate(sample("ifupdown/run-network-ifstate.txt")),
-                ElementsAre(Pair("eth1", "eth1")));
+                ElementsAre(Pair("eth1"_name, "eth1")));
     EXPECT_THAT(parseIfstate("eth1=home\nnothing\n=x\na b=c\nlo=lo"),
-                ElementsAre(Pair("eth1", "home"), Pair("lo", "lo")));
+                ElementsAre(Pair("eth1"_name, "home"), Pair("lo"_name, "lo")));
 }
 
 class IfupdownTest : public testing::Test {
@@ -68,7 +68,7 @@ class IfupdownTest : public testing::Test {
                                                   std::optional<bool> dhcp4,
                                                   std::optional<bool> dhcp6 = {}) const {
         return {.client = Client::Ifupdown,
-                .interfaceName = name,
+                .interfaceName = interfaceName(name),
                 .dhcp4 = dhcp4,
                 .dhcp6 = dhcp6,
                 .staticAddresses = {},
@@ -92,7 +92,7 @@ TEST_F(IfupdownTest, EachMethodHasItsMeaning) {
         "iface a inet static\n address 192.0.2.1\niface b inet bootp\niface c inet ipv4ll\n"
         "iface d inet ppp\niface e inet manual\niface f inet6 dhcp\niface g inet6 auto\n");
     LinkConfiguration a = configuration("a", false);
-    a.staticAddresses = {"192.0.2.1"};
+    a.staticAddresses = {"192.0.2.1"_ip};
     LinkConfiguration b = configuration("b", false);
     b.bootp4 = true;
     LinkConfiguration c = configuration("c", false);
@@ -115,14 +115,14 @@ TEST_F(IfupdownTest, FurtherFilesAreReadAndWatched) {
     root_.write("/etc/network/interfaces.d/a.save", "iface x inet dhcp\n");
     root_.write("/etc/more/b", "iface b inet dhcp\nsource /etc/network/interfaces\n");
     root_.write("/etc/one", "iface c inet dhcp\n");
-    std::vector<std::pair<std::string, std::string>> found;
+    std::vector<std::pair<std::optional<InterfaceName>, std::string>> found;
     const ClientFacts facts = read();
     for (const LinkConfiguration& each : facts.configurations) {
         found.emplace_back(each.interfaceName, each.origin);
     }
-    EXPECT_THAT(found, ElementsAre(Pair("a", root_.path("/etc/network/interfaces.d/a.conf")),
-                                   Pair("b", root_.path("/etc/more/b")),
-                                   Pair("c", root_.path("/etc/one"))));
+    EXPECT_THAT(found, ElementsAre(Pair("a"_name, root_.path("/etc/network/interfaces.d/a.conf")),
+                                   Pair("b"_name, root_.path("/etc/more/b")),
+                                   Pair("c"_name, root_.path("/etc/one"))));
     EXPECT_THAT(facts.places,
                 testing::IsSupersetOf({WatchedPlace{root_.path("/etc/network/interfaces.d"), ""},
                                        WatchedPlace{root_.path("/etc/more"), ""},

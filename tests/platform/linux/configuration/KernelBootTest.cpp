@@ -8,10 +8,11 @@ namespace ZR::Live {
 namespace {
 
 TEST(KernelBoot, TheProtocolStandsInTheFirstLine) {
-    EXPECT_EQ(parseKernelBoot("#DHCP\n"), (BootAnswer{.bootp = false, .server = "", .origin = ""}));
+    EXPECT_EQ(parseKernelBoot("#DHCP\n"),
+              (BootResponse{.bootp = false, .server = {}, .origin = ""}));
     EXPECT_EQ(parseKernelBoot("#PROTO: BOOTP\ndomain example\nnameserver 192.0.2.1\n"
                               "bootserver 192.0.2.99\n"),
-              (BootAnswer{.bootp = true, .server = "192.0.2.99", .origin = ""}));
+              (BootResponse{.bootp = true, .server = "192.0.2.99"_ip, .origin = ""}));
 }
 
 TEST(KernelBoot, WhoeverWasToldItsAddressAskedNobody) {
@@ -23,7 +24,7 @@ TEST(KernelBoot, WhoeverWasToldItsAddressAskedNobody) {
 
 TEST(KernelBoot, AServerThatIsNoAddressIsNone) {
     EXPECT_EQ(parseKernelBoot("#DHCP\nbootserver nobody"),
-              (BootAnswer{.bootp = false, .server = "", .origin = ""}));
+              (BootResponse{.bootp = false, .server = {}, .origin = ""}));
 }
 
 TEST(KernelBoot, OfThisNetworkNamespace) {
@@ -31,9 +32,9 @@ TEST(KernelBoot, OfThisNetworkNamespace) {
     EXPECT_EQ(readWith(readKernelBoot, root), ClientFacts{});
     root.write("/proc/thread-self/net/pnp", "#DHCP\nbootserver 192.0.2.99\n");
     const ClientFacts facts = readWith(readKernelBoot, root);
-    EXPECT_EQ(facts.boot, (BootAnswer{.bootp = false,
-                                      .server = "192.0.2.99",
-                                      .origin = root.path("/proc/thread-self/net/pnp")}));
+    EXPECT_EQ(facts.boot, (BootResponse{.bootp = false,
+                                        .server = "192.0.2.99"_ip,
+                                        .origin = root.path("/proc/thread-self/net/pnp")}));
 }
 
 }  // namespace

@@ -21,7 +21,7 @@ TEST(Netplan, CapturedConfigurationForNetworkd) {
     const TemporaryDirectory root;
     root.write(file, sample("netplan/10-netplan-eth1.network"));
     EXPECT_THAT(read(root), ElementsAre(LinkConfiguration{.client = Client::Netplan,
-                                                          .interfaceName = "eth1",
+                                                          .interfaceName = "eth1"_name,
                                                           .dhcp4 = true,
                                                           .dhcp6 = false,
                                                           .staticAddresses = {},

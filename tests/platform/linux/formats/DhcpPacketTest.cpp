@@ -47,15 +47,15 @@ const std::string server{"\xc0\x00\x02\x01", 4};
 const std::string tenMinutes{"\0\0\x02\x58", 4};
 
 TEST(DhcpReply, CapturedByVersion9) {
-    EXPECT_EQ(reply(sample("dhcpcd-9/eth1.lease")), (DhcpReply{.address = "198.51.100.107",
-                                                               .server = "198.51.100.1",
+    EXPECT_EQ(reply(sample("dhcpcd-9/eth1.lease")), (DhcpReply{.address = "198.51.100.107"_ip,
+                                                               .server = "198.51.100.1"_ip,
                                                                .bootp = false,
                                                                .leaseTime = 600}));
 }
 
 TEST(DhcpReply, CapturedByVersion10) {
-    EXPECT_EQ(reply(sample("dhcpcd-10/eth1.lease")), (DhcpReply{.address = "198.51.100.121",
-                                                                .server = "198.51.100.1",
+    EXPECT_EQ(reply(sample("dhcpcd-10/eth1.lease")), (DhcpReply{.address = "198.51.100.121"_ip,
+                                                                .server = "198.51.100.1"_ip,
                                                                 .bootp = false,
                                                                 .leaseTime = 600}));
 }
@@ -92,25 +92,27 @@ TEST(DhcpReply, WithoutAnEndItWasTorn) {
 
 TEST(DhcpReply, WithoutAMessageTypeItIsBootp) {
     EXPECT_EQ(reply(packet(end)),
-              (DhcpReply{.address = "192.0.2.7", .server = "", .bootp = true, .leaseTime = {}}));
+              (DhcpReply{.address = "192.0.2.7"_ip, .server = {}, .bootp = true, .leaseTime = {}}));
 }
 
 TEST(DhcpReply, PaddingAndWhatFollowsTheEndDoNotCount) {
-    EXPECT_EQ(reply(packet(std::string(3, '\0') + option(53, "\5") + end + option(54, server))),
-              (DhcpReply{.address = "192.0.2.7", .server = "", .bootp = false, .leaseTime = {}}));
+    EXPECT_EQ(
+        reply(packet(std::string(3, '\0') + option(53, "\5") + end + option(54, server))),
+        (DhcpReply{.address = "192.0.2.7"_ip, .server = {}, .bootp = false, .leaseTime = {}}));
 }
 
 TEST(DhcpReply, OptionsMayGoOnInTheFileAndServerNameFields) {
     const std::string both = option(53, "\5") + option(52, "\3") + end;
-    EXPECT_EQ(
-        reply(packet(both, option(54, server) + end, option(51, tenMinutes) + end)),
-        (DhcpReply{
-            .address = "192.0.2.7", .server = "192.0.2.1", .bootp = false, .leaseTime = 600}));
+    EXPECT_EQ(reply(packet(both, option(54, server) + end, option(51, tenMinutes) + end)),
+              (DhcpReply{.address = "192.0.2.7"_ip,
+                         .server = "192.0.2.1"_ip,
+                         .bootp = false,
+                         .leaseTime = 600}));
     const std::string fileOnly = option(53, "\5") + option(52, "\1") + end;
     EXPECT_EQ(reply(packet(fileOnly, option(54, server) + end, option(51, tenMinutes))).leaseTime,
               std::nullopt);
     const std::string neither = option(53, "\5") + end;
-    EXPECT_EQ(reply(packet(neither, option(54, server) + end)).server, "");
+    EXPECT_EQ(reply(packet(neither, option(54, server) + end)).server, std::nullopt);
 }
 
 TEST(DhcpReply, AnOptionThatOverflowsItsFieldIsRefused) {
@@ -126,19 +128,19 @@ TEST(DhcpReply, PartsOfASplitOptionBelongTogether) {
     EXPECT_EQ(reply(packet(option(54, server.substr(0, 1)) + option(53, "\5") +
                            option(54, server.substr(1)) + end))
                   .server,
-              "192.0.2.1");
+              "192.0.2.1"_ip);
 }
 
 TEST(DhcpReply, ValuesOfAnotherLengthAreNone) {
     const DhcpReply found = reply(packet(option(54, "\1\2") + option(51, "\1") + end));
-    EXPECT_EQ(found.server, "");
+    EXPECT_EQ(found.server, std::nullopt);
     EXPECT_EQ(found.leaseTime, std::nullopt);
 }
 
 TEST(DhcpReply, WithoutAnAddressItGivesNone) {
     std::string none = packet(end);
     none.replace(16, 4, 4, '\0');
-    EXPECT_EQ(reply(none).address, "");
+    EXPECT_EQ(reply(none).address, std::nullopt);
 }
 
 Dhcp6Reply reply6(const std::string& packet) {
@@ -158,13 +160,15 @@ std::string address6(const std::string& lifetime) {
 const std::string header6{"\7abc"};
 
 TEST(Dhcp6Reply, CapturedByVersion9) {
-    EXPECT_EQ(reply6(sample("dhcpcd-9/eth1.lease6")),
-              (Dhcp6Reply{.addresses = {{.address = "2001:db8:99::142", .validLifetime = 600}}}));
+    EXPECT_EQ(
+        reply6(sample("dhcpcd-9/eth1.lease6")),
+        (Dhcp6Reply{.addresses = {{.address = "2001:db8:99::142"_ip, .validLifetime = 600}}}));
 }
 
 TEST(Dhcp6Reply, CapturedByVersion10) {
-    EXPECT_EQ(reply6(sample("dhcpcd-10/eth1.lease6")),
-              (Dhcp6Reply{.addresses = {{.address = "2001:db8:99::100", .validLifetime = 600}}}));
+    EXPECT_EQ(
+        reply6(sample("dhcpcd-10/eth1.lease6")),
+        (Dhcp6Reply{.addresses = {{.address = "2001:db8:99::100"_ip, .validLifetime = 600}}}));
 }
 
 TEST(Dhcp6Reply, BeginningsEndBetweenOptionsOrAreRefused) {
@@ -188,8 +192,8 @@ TEST(Dhcp6Reply, AddressesOfBothKindsOfAssociationsCount) {
     const std::string na = option6(3, std::string(12, '\0') + address6(hour));
     const std::string ta = option6(4, std::string(4, '\0') + address6("\xff\xff\xff\xff"));
     EXPECT_EQ(reply6(header6 + na + ta),
-              (Dhcp6Reply{.addresses = {{.address = "::1", .validLifetime = 3600},
-                                        {.address = "::1", .validLifetime = UINT32_MAX}}}));
+              (Dhcp6Reply{.addresses = {{.address = "::1"_ip, .validLifetime = 3600},
+                                        {.address = "::1"_ip, .validLifetime = UINT32_MAX}}}));
 }
 
 TEST(Dhcp6Reply, AnAddressWithoutALifetimeIsTakenBack) {

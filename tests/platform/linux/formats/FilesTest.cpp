@@ -13,12 +13,12 @@ namespace {
 using testing::ElementsAre;
 using testing::IsEmpty;
 
-TEST(Files, AbsentFilesAndDirectoriesAreNoComplaint) {
+TEST(Files, AbsentFilesAndDirectoriesAreNoDiagnostic) {
     const TemporaryDirectory root;
-    std::vector<std::string> complaints;
-    EXPECT_EQ(readOptionalFile(root.path("/none"), complaints), std::nullopt);
-    EXPECT_THAT(listOptionalDirectory(root.path("/none/there"), complaints), IsEmpty());
-    EXPECT_THAT(complaints, IsEmpty());
+    std::vector<std::string> diagnostics;
+    EXPECT_EQ(readOptionalFile(root.path("/none"), diagnostics), std::nullopt);
+    EXPECT_THAT(listOptionalDirectory(root.path("/none/there"), diagnostics), IsEmpty());
+    EXPECT_THAT(diagnostics, IsEmpty());
 }
 
 TEST(Files, NamesAreSortedAndHalfWrittenFilesLeftOut) {
@@ -26,11 +26,11 @@ TEST(Files, NamesAreSortedAndHalfWrittenFilesLeftOut) {
     for (const char* name : {"/b", "/.#b1234", "/a"}) {
         root.write(name, "");
     }
-    std::vector<std::string> complaints;
-    EXPECT_THAT(listOptionalDirectory(root.path(), complaints), ElementsAre("a", "b"));
+    std::vector<std::string> diagnostics;
+    EXPECT_THAT(listOptionalDirectory(root.path(), diagnostics), ElementsAre("a", "b"));
 }
 
-TEST(Files, WhatMayNotBeReadIsAComplaint) {
+TEST(Files, WhatMayNotBeReadIsADiagnostic) {
     constexpr uid_t nobody = 65534;
     const TemporaryDirectory root;
     root.write("/file", "x");
@@ -42,24 +42,24 @@ TEST(Files, WhatMayNotBeReadIsAComplaint) {
     if (user == 0) {  // who may read everything
         ASSERT_EQ(::seteuid(nobody), 0);
     }
-    std::vector<std::string> complaints;
-    const auto content = readOptionalFile(root.path("/file"), complaints);
-    const auto names = listOptionalDirectory(root.path("/directory"), complaints);
+    std::vector<std::string> diagnostics;
+    const auto content = readOptionalFile(root.path("/file"), diagnostics);
+    const auto names = listOptionalDirectory(root.path("/directory"), diagnostics);
     ASSERT_EQ(::seteuid(user), 0);
     ASSERT_EQ(::chmod(root.path("/directory").c_str(), 0700), 0);  // else it could not be removed
     EXPECT_EQ(content, std::nullopt);
     EXPECT_THAT(names, IsEmpty());
-    EXPECT_THAT(complaints,
+    EXPECT_THAT(diagnostics,
                 ElementsAre("cannot read " + root.path("/file") + ": Permission denied",
                             "cannot read " + root.path("/directory") + ": Permission denied"));
 }
 
-TEST(Files, AFileBeyondAllMeasureIsAComplaint) {
+TEST(Files, AFileBeyondAllMeasureIsADiagnostic) {
     const TemporaryDirectory root;
     root.write("/large", std::string((std::size_t{4} << 20U) + 1, 'x'));
-    std::vector<std::string> complaints;
-    EXPECT_EQ(readOptionalFile(root.path("/large"), complaints), std::nullopt);
-    EXPECT_EQ(complaints.size(), 1U);
+    std::vector<std::string> diagnostics;
+    EXPECT_EQ(readOptionalFile(root.path("/large"), diagnostics), std::nullopt);
+    EXPECT_EQ(diagnostics.size(), 1U);
 }
 
 }  // namespace

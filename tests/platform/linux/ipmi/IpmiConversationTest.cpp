@@ -5,6 +5,7 @@
 
 #include <algorithm>
 
+#include "LinuxSupport.h"
 #include "ScriptedProcessor.h"
 
 namespace ZR::Live {
@@ -47,8 +48,8 @@ TEST_F(IpmiConversationTest, UsualChannelTakesOneRound) {
     begin(ScriptedProcessor::withLan(1, 2, leased));
     EXPECT_EQ(processor_.received, 0) << "nobody is kept for answers that cannot be there";
     EXPECT_EQ(later(1ms), State::Finished);
-    EXPECT_EQ(conversation_->lan(), (LanChannel{1, std::uint8_t{2}, "198.51.100.77"}));
-    EXPECT_THAT(conversation_->complaints(), IsEmpty());
+    EXPECT_EQ(conversation_->lan(), (LanChannel{1, std::uint8_t{2}, "198.51.100.77"_ip}));
+    EXPECT_THAT(conversation_->diagnostics(), IsEmpty());
     EXPECT_THAT(asked(), ElementsAre(getChannelInfo(1), getLanAddressSource(1), getLanAddress(1)));
 }
 
@@ -58,8 +59,8 @@ TEST_F(IpmiConversationTest, AnotherChannelIsFoundAmongAll) {
     processor.channel(7, 1);
     begin(std::move(processor));
     EXPECT_EQ(later(1ms), State::Finished);
-    EXPECT_EQ(conversation_->lan(), (LanChannel{8, std::uint8_t{1}, "198.51.100.77"}));
-    EXPECT_THAT(conversation_->complaints(), IsEmpty());
+    EXPECT_EQ(conversation_->lan(), (LanChannel{8, std::uint8_t{1}, "198.51.100.77"_ip}));
+    EXPECT_THAT(conversation_->diagnostics(), IsEmpty());
     EXPECT_EQ(asked().size(), 3U + 11U + 2U);
 }
 
@@ -78,7 +79,7 @@ TEST_F(IpmiConversationTest, OfSeveralChannelsTheFirstCountsInWhateverOrderTheyA
         ASSERT_EQ(transport_.send(search[i].first, search[i].second), 0);
     }
     EXPECT_EQ(later(1ms), State::Finished);
-    EXPECT_EQ(conversation_->lan(), (LanChannel{3, std::uint8_t{1}, "192.0.2.3"}));
+    EXPECT_EQ(conversation_->lan(), (LanChannel{3, std::uint8_t{1}, "192.0.2.3"_ip}));
 }
 
 TEST_F(IpmiConversationTest, ThePresentChannelIsAskedForByItsOwnNumber) {
@@ -86,7 +87,7 @@ TEST_F(IpmiConversationTest, ThePresentChannelIsAskedForByItsOwnNumber) {
     processor.answers[{0x06, 0x42, 0x0e}] = processor.answers[{0x06, 0x42, 0x0d}];
     begin(std::move(processor));
     EXPECT_EQ(later(1ms), State::Finished);
-    EXPECT_EQ(conversation_->lan(), (LanChannel{0xd, std::uint8_t{2}, "198.51.100.77"}));
+    EXPECT_EQ(conversation_->lan(), (LanChannel{0xd, std::uint8_t{2}, "198.51.100.77"_ip}));
 }
 
 TEST_F(IpmiConversationTest, AnAnswerAboutAnotherChannelIsNotBelieved) {
@@ -103,21 +104,21 @@ TEST_F(IpmiConversationTest, NoLanChannelIsAnAnswerToo) {
     begin(std::move(processor));
     EXPECT_EQ(later(1ms), State::Finished);
     EXPECT_EQ(conversation_->lan(), std::nullopt);
-    EXPECT_THAT(conversation_->complaints(), IsEmpty());
+    EXPECT_THAT(conversation_->diagnostics(), IsEmpty());
 }
 
 TEST_F(IpmiConversationTest, SourcesOfFirmwareAndOtherProtocols) {
     for (const std::uint8_t source : Bytes{3, 4}) {
         begin(ScriptedProcessor::withLan(1, source, leased));
         EXPECT_EQ(later(1ms), State::Finished);
-        EXPECT_EQ(conversation_->lan(), (LanChannel{1, source, "198.51.100.77"}));
+        EXPECT_EQ(conversation_->lan(), (LanChannel{1, source, "198.51.100.77"_ip}));
     }
 }
 
 TEST_F(IpmiConversationTest, DhcpWithoutALease) {
     begin(ScriptedProcessor::withLan(1, 2, {0, 0, 0, 0}));
     EXPECT_EQ(later(1ms), State::Finished);
-    EXPECT_EQ(conversation_->lan(), (LanChannel{1, std::uint8_t{2}, ""}));
+    EXPECT_EQ(conversation_->lan(), (LanChannel{1, std::uint8_t{2}, std::nullopt}));
 }
 
 TEST_F(IpmiConversationTest, AnUnsupportedParameterIsJustNotTold) {
@@ -125,19 +126,19 @@ TEST_F(IpmiConversationTest, AnUnsupportedParameterIsJustNotTold) {
     processor.refuseParameter(1, 4, 0x80);
     begin(std::move(processor));
     EXPECT_EQ(later(1ms), State::Finished);
-    EXPECT_EQ(conversation_->lan(), (LanChannel{1, std::nullopt, "198.51.100.77"}));
-    EXPECT_THAT(conversation_->complaints(), IsEmpty());
+    EXPECT_EQ(conversation_->lan(), (LanChannel{1, std::nullopt, "198.51.100.77"_ip}));
+    EXPECT_THAT(conversation_->diagnostics(), IsEmpty());
 }
 
-TEST_F(IpmiConversationTest, OtherRefusalsAndBrokenAnswersAreComplainedAbout) {
+TEST_F(IpmiConversationTest, OtherRefusalsAndBrokenAnswersAreReported) {
     ScriptedProcessor processor = ScriptedProcessor::withLan(1, 2, leased);
     processor.refuseParameter(1, 4, 0xd4);
     processor.parameter(1, 3, {198, 51});
     begin(std::move(processor));
     EXPECT_EQ(later(1ms), State::Finished);
-    EXPECT_EQ(conversation_->lan(), (LanChannel{1, std::nullopt, ""}));
-    EXPECT_THAT(conversation_->complaints(), ElementsAre("address source: completion code 0xd4",
-                                                         "address: the answer is too short"));
+    EXPECT_EQ(conversation_->lan(), (LanChannel{1, std::nullopt, std::nullopt}));
+    EXPECT_THAT(conversation_->diagnostics(), ElementsAre("address source: completion code 0xd4",
+                                                          "address: the answer is too short"));
 }
 
 TEST_F(IpmiConversationTest, ABusyProcessorIsNotOneWithoutALanChannel) {
@@ -147,7 +148,7 @@ TEST_F(IpmiConversationTest, ABusyProcessorIsNotOneWithoutALanChannel) {
     }
     begin(std::move(busy));
     EXPECT_EQ(later(1ms), State::Failed);
-    EXPECT_THAT(conversation_->complaints(), ElementsAre("channels: completion code 0xc0"));
+    EXPECT_THAT(conversation_->diagnostics(), ElementsAre("channels: completion code 0xc0"));
 }
 
 TEST_F(IpmiConversationTest, ABusyProcessorsParametersAreNotUnknown) {
@@ -156,7 +157,7 @@ TEST_F(IpmiConversationTest, ABusyProcessorsParametersAreNotUnknown) {
     begin(std::move(busy));
     EXPECT_EQ(later(1ms), State::Failed);
     EXPECT_EQ(conversation_->lan(), std::nullopt);
-    EXPECT_THAT(conversation_->complaints(), ElementsAre("address: completion code 0xc3"));
+    EXPECT_THAT(conversation_->diagnostics(), ElementsAre("address: completion code 0xc3"));
 }
 
 TEST_F(IpmiConversationTest, AFailureHasOneReasonWhateverElseWasAnswered) {
@@ -165,7 +166,7 @@ TEST_F(IpmiConversationTest, AFailureHasOneReasonWhateverElseWasAnswered) {
     busy.parameter(1, 3, {198, 51});
     begin(std::move(busy));
     EXPECT_EQ(later(1ms), State::Failed);
-    EXPECT_THAT(conversation_->complaints(), ElementsAre("address source: completion code 0xc3"));
+    EXPECT_THAT(conversation_->diagnostics(), ElementsAre("address source: completion code 0xc3"));
 }
 
 TEST_F(IpmiConversationTest, SilenceIsGivenUpAfterOneSecond) {
@@ -175,7 +176,7 @@ TEST_F(IpmiConversationTest, SilenceIsGivenUpAfterOneSecond) {
     EXPECT_EQ(later(400ms), State::Underway);
     EXPECT_EQ(later(600ms), State::Underway);
     EXPECT_EQ(later(1ms), State::Failed);
-    EXPECT_THAT(conversation_->complaints(), ElementsAre("no answer within one second"));
+    EXPECT_THAT(conversation_->diagnostics(), ElementsAre("no answer within one second"));
     EXPECT_EQ(later(1ms), State::Failed) << "and stays so";
 }
 
@@ -206,25 +207,25 @@ TEST_F(IpmiConversationTest, TheSecondIsForAllRoundsTogether) {
 TEST_F(IpmiConversationTest, AnswersThatWaitedLongForTheirReaderWereNotLate) {
     begin(ScriptedProcessor::withLan(1, 2, leased));
     EXPECT_EQ(later(10min), State::Finished);
-    EXPECT_EQ(conversation_->lan(), (LanChannel{1, std::uint8_t{2}, "198.51.100.77"}));
+    EXPECT_EQ(conversation_->lan(), (LanChannel{1, std::uint8_t{2}, "198.51.100.77"_ip}));
 }
 
 TEST_F(IpmiConversationTest, AnswersComeInAnyOrder) {
     begin(ScriptedProcessor::withLan(1, 2, leased));
     std::reverse(processor_.ready.begin(), processor_.ready.end());
     EXPECT_EQ(later(1ms), State::Finished);
-    EXPECT_EQ(conversation_->lan(), (LanChannel{1, std::uint8_t{2}, "198.51.100.77"}));
+    EXPECT_EQ(conversation_->lan(), (LanChannel{1, std::uint8_t{2}, "198.51.100.77"_ip}));
 }
 
 TEST_F(IpmiConversationTest, ForeignMessagesDoNotCount) {
     begin(ScriptedProcessor::withLan(1, 2, leased));
-    const IpmiAnswer lie{0x0d, 0x02, {0, 0x11, 203, 0, 113, 9}};
+    const IpmiResponse lie{0x0d, 0x02, {0, 0x11, 203, 0, 113, 9}};
     const long last = processor_.ready.back().id;
     processor_.ready.push_front({.id = 0, .answer = lie});
     processor_.ready.push_front({.id = -1, .answer = lie});
     processor_.ready.push_front({.id = last + 1, .answer = lie});
     EXPECT_EQ(later(1ms), State::Finished);
-    EXPECT_EQ(conversation_->lan(), (LanChannel{1, std::uint8_t{2}, "198.51.100.77"}));
+    EXPECT_EQ(conversation_->lan(), (LanChannel{1, std::uint8_t{2}, "198.51.100.77"_ip}));
 }
 
 TEST_F(IpmiConversationTest, ASecondAnswerToOneQuestionDoesNotCount) {
@@ -234,7 +235,7 @@ TEST_F(IpmiConversationTest, ASecondAnswerToOneQuestionDoesNotCount) {
     again.answer.data.back() = 1;
     processor_.ready.insert(processor_.ready.begin() + 2, again);
     EXPECT_EQ(later(1ms), State::Finished);
-    EXPECT_EQ(conversation_->lan(), (LanChannel{1, std::uint8_t{2}, "198.51.100.77"}));
+    EXPECT_EQ(conversation_->lan(), (LanChannel{1, std::uint8_t{2}, "198.51.100.77"_ip}));
 }
 
 TEST_F(IpmiConversationTest, AFloodOfForeignMessagesKeepsNobody) {
@@ -252,7 +253,7 @@ TEST_F(IpmiConversationTest, ARefusingTransportEndsItAtOnce) {
     processor.sendError = EINVAL;
     begin(std::move(processor));
     EXPECT_EQ(conversation_->state(), State::Failed);
-    EXPECT_THAT(conversation_->complaints(), ElementsAre("cannot ask: Invalid argument"));
+    EXPECT_THAT(conversation_->diagnostics(), ElementsAre("cannot ask: Invalid argument"));
     EXPECT_EQ(later(1ms), State::Failed);
     EXPECT_EQ(processor_.received, 0);
 }
@@ -263,7 +264,7 @@ TEST_F(IpmiConversationTest, ATransportThatBreaksEndsIt) {
     processor.receiveError = ENODEV;
     begin(std::move(processor));
     EXPECT_EQ(later(1ms), State::Failed);
-    EXPECT_THAT(conversation_->complaints(), ElementsAre("cannot receive: No such device"));
+    EXPECT_THAT(conversation_->diagnostics(), ElementsAre("cannot receive: No such device"));
 }
 
 TEST_F(IpmiConversationTest, NumbersOfRequestsAreNeverUsedAgain) {

@@ -158,7 +158,7 @@ TEST_F(IpmiDeviceTest, AnswersComeWithTheNumberOfTheirRequest) {
     const IpmiReceived received = device_->receive();
     EXPECT_EQ(received.error, 0);
     EXPECT_EQ(received.id, 77);
-    EXPECT_EQ(received.answer, (IpmiAnswer{0x0d, 0x02, {0, 0x11, 2}}));
+    EXPECT_EQ(received.answer, (IpmiResponse{0x0d, 0x02, {0, 0x11, 2}}));
     EXPECT_EQ(device_->receive().error, EAGAIN);
 }
 

@@ -12,17 +12,17 @@ namespace {
 
 using Bytes = std::vector<std::uint8_t>;
 
-IpmiAnswer lanAnswer(Bytes data) {
+IpmiResponse lanAnswer(Bytes data) {
     return {0x0d, 0x02, std::move(data)};
 }
 
-IpmiAnswer channelAnswer(Bytes data) {
+IpmiResponse channelAnswer(Bytes data) {
     return {0x07, 0x42, std::move(data)};
 }
 
 /// The answer in a captured table to the parameter of channel 1: the bytes behind
 /// "=>", with the completion code that the table leaves out when it is 0.
-IpmiAnswer captured(int parameter) {
+IpmiResponse captured(int parameter) {
     std::istringstream lines{sample("ipmi/raw-get-lan-config.txt")};
     const std::string wanted = "raw 0x0c 0x02 0x01 " + std::to_string(parameter) + " 0 0 => ";
     for (std::string line; std::getline(lines, line);) {
@@ -55,7 +55,8 @@ TEST(IpmiMessages, RequestsAreThoseOfTheStandard) {
 }
 
 TEST(IpmiMessages, CapturedAddress) {
-    EXPECT_EQ(decodeLanAddress(captured(3)), IpmiDecoded<std::string>{"198.51.100.77"});
+    EXPECT_EQ(decodeLanAddress(captured(3)),
+              IpmiDecoded<std::optional<IpAddress>>{"198.51.100.77"_ip});
 }
 
 TEST(IpmiMessages, CapturedAddressSource) {
@@ -64,15 +65,16 @@ TEST(IpmiMessages, CapturedAddressSource) {
 
 TEST(IpmiMessages, CapturedRefusal) {
     const auto address = decodeLanAddress(captured(50));
-    EXPECT_EQ(address, refusal<std::string>("completion code 0x80", 0x80));
+    EXPECT_EQ(address, refusal<std::optional<IpAddress>>("completion code 0x80", 0x80));
     EXPECT_TRUE(std::get<IpmiRefusal>(address).unsupported());
     EXPECT_FALSE(std::get<IpmiRefusal>(address).passing());
 }
 
 TEST(IpmiMessages, AllZeroIsNoAddress) {
-    EXPECT_EQ(decodeLanAddress(lanAnswer({0, 0x11, 0, 0, 0, 0})), IpmiDecoded<std::string>{""});
+    EXPECT_EQ(decodeLanAddress(lanAnswer({0, 0x11, 0, 0, 0, 0})),
+              IpmiDecoded<std::optional<IpAddress>>{std::nullopt});
     EXPECT_EQ(decodeLanAddress(lanAnswer({0, 0x11, 0, 0, 0, 1})),
-              IpmiDecoded<std::string>{"0.0.0.1"});
+              IpmiDecoded<std::optional<IpAddress>>{"0.0.0.1"_ip});
 }
 
 TEST(IpmiMessages, OfTheAddressSourceTheLowHalfCounts) {
@@ -90,14 +92,15 @@ TEST(IpmiMessages, ChannelNumberAndMediumWithoutTheirReservedBits) {
 
 TEST(IpmiMessages, MoreBytesThanExpectedDoNotMatter) {
     EXPECT_EQ(decodeLanAddress(lanAnswer({0, 0x11, 192, 0, 2, 1, 9, 9})),
-              IpmiDecoded<std::string>{"192.0.2.1"});
+              IpmiDecoded<std::optional<IpAddress>>{"192.0.2.1"_ip});
 }
 
 TEST(IpmiMessages, ShortAnswersAreToldAsSuch) {
-    EXPECT_EQ(decodeLanAddress(lanAnswer({})), refusal<std::string>("the answer is empty"));
+    EXPECT_EQ(decodeLanAddress(lanAnswer({})),
+              refusal<std::optional<IpAddress>>("the answer is empty"));
     for (const Bytes& data : {Bytes{0}, Bytes{0, 0x11}, Bytes{0, 0x11, 192, 0, 2}}) {
         EXPECT_EQ(decodeLanAddress(lanAnswer(data)),
-                  refusal<std::string>("the answer is too short"));
+                  refusal<std::optional<IpAddress>>("the answer is too short"));
     }
     EXPECT_EQ(decodeLanAddressSource(lanAnswer({0, 0x11})),
               refusal<std::uint8_t>("the answer is too short"));
@@ -107,10 +110,11 @@ TEST(IpmiMessages, ShortAnswersAreToldAsSuch) {
 
 TEST(IpmiMessages, AnswersToOtherCommandsAreNotBelieved) {
     const Bytes good{0, 0x11, 192, 0, 2, 1};
-    for (const IpmiAnswer& answer : {IpmiAnswer{0x0c, 0x02, good}, IpmiAnswer{0x0d, 0x01, good},
-                                     IpmiAnswer{0x07, 0x42, good}}) {
+    for (const IpmiResponse& answer :
+         {IpmiResponse{0x0c, 0x02, good}, IpmiResponse{0x0d, 0x01, good},
+          IpmiResponse{0x07, 0x42, good}}) {
         EXPECT_EQ(decodeLanAddress(answer),
-                  refusal<std::string>("the answer is one to another command"));
+                  refusal<std::optional<IpAddress>>("the answer is one to another command"));
     }
 }
 
@@ -138,8 +142,8 @@ TEST(IpmiMessages, AnyBytesGiveFactsOrAReason) {
             data[0] = 0;
         }
         for (const auto& answer : {lanAnswer(data), channelAnswer(data),
-                                   IpmiAnswer{static_cast<std::uint8_t>(byte(random)),
-                                              static_cast<std::uint8_t>(byte(random)), data}}) {
+                                   IpmiResponse{static_cast<std::uint8_t>(byte(random)),
+                                                static_cast<std::uint8_t>(byte(random)), data}}) {
             const auto check = [&](const auto& decoded) {
                 if (const auto* const refused = std::get_if<IpmiRefusal>(&decoded)) {
                     EXPECT_FALSE(refused->reason.empty());

@@ -3,6 +3,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include "LinuxSupport.h"
 #include "ScriptedProcessor.h"
 
 namespace ZR::Live {
@@ -13,13 +14,13 @@ using testing::ElementsAre;
 using testing::IsEmpty;
 
 const Bytes leased{198, 51, 100, 77};
-const ServiceProcessor known{.lan = LanChannel{1, std::uint8_t{2}, "198.51.100.77"}};
+const ServiceProcessor known{.lan = LanChannel{1, std::uint8_t{2}, "198.51.100.77"_ip}};
 
 class IpmiReaderTest : public testing::Test {
   protected:
     std::optional<ServiceProcessor> read() {
-        complaints_.clear();
-        return reader_.read(complaints_);
+        diagnostics_.clear();
+        return reader_.read(diagnostics_);
     }
     /// What is known once the questions of this moment have been answered.
     std::optional<ServiceProcessor> settled() {
@@ -29,7 +30,7 @@ class IpmiReaderTest : public testing::Test {
 
     ScriptedProcessor processor_ = ScriptedProcessor::withLan(1, 2, leased);
     std::chrono::steady_clock::time_point now_{1000h};
-    std::vector<std::string> complaints_;
+    std::vector<std::string> diagnostics_;
     IpmiReader reader_{std::make_unique<ScriptedIpmi>(processor_), [this] { return now_; }};
 };
 
@@ -37,7 +38,7 @@ TEST_F(IpmiReaderTest, WithoutADeviceThereIsNoProcessor) {
     processor_.openError = ENOENT;
     EXPECT_FALSE(reader_.changed());
     EXPECT_EQ(read(), std::nullopt);
-    EXPECT_THAT(complaints_, IsEmpty());
+    EXPECT_THAT(diagnostics_, IsEmpty());
     EXPECT_EQ(processor_.opened, 1);
     EXPECT_EQ(processor_.received, 0);
 }
@@ -74,7 +75,7 @@ TEST_F(IpmiReaderTest, IsAskedAtMostOnceAMinute) {
     EXPECT_FALSE(reader_.changed()) << "asked, and not answered yet";
     EXPECT_EQ(processor_.asked.size(), 2 * calls);
     EXPECT_TRUE(reader_.changed());
-    EXPECT_EQ(read()->lan->address, "192.0.2.7");
+    EXPECT_EQ(read()->lan->address, "192.0.2.7"_ip);
 }
 
 TEST_F(IpmiReaderTest, AMachineWithoutADeviceIsLookedAtOnceAMinuteToo) {
@@ -108,7 +109,7 @@ TEST_F(IpmiReaderTest, RareCallsTakeTheOldAnswersAndAskAnew) {
     now_ += 1h;
     EXPECT_EQ(read(), known) << "what was true an hour ago";
     now_ += 1h;
-    EXPECT_EQ(read()->lan->address, "192.0.2.7");
+    EXPECT_EQ(read()->lan->address, "192.0.2.7"_ip);
 }
 
 TEST_F(IpmiReaderTest, SilenceLeavesWhatWasKnownUntilTheThirdTime) {
@@ -119,7 +120,7 @@ TEST_F(IpmiReaderTest, SilenceLeavesWhatWasKnownUntilTheThirdTime) {
         static_cast<void>(reader_.changed());
         now_ += 2s;
         EXPECT_EQ(read(), known) << failure;
-        EXPECT_THAT(complaints_, ElementsAre("service processor: no answer within one second"));
+        EXPECT_THAT(diagnostics_, ElementsAre("service processor: no answer within one second"));
     }
     now_ += 1min;
     static_cast<void>(reader_.changed());
@@ -130,7 +131,7 @@ TEST_F(IpmiReaderTest, SilenceLeavesWhatWasKnownUntilTheThirdTime) {
     now_ += 1min;
     static_cast<void>(reader_.changed());
     EXPECT_EQ(settled(), known);
-    EXPECT_THAT(complaints_, IsEmpty());
+    EXPECT_THAT(diagnostics_, IsEmpty());
 }
 
 TEST_F(IpmiReaderTest, OneAnswerMakesUpForFailures) {
@@ -146,13 +147,13 @@ TEST_F(IpmiReaderTest, OneAnswerMakesUpForFailures) {
     }
 }
 
-TEST_F(IpmiReaderTest, ANewComplaintIsAChangeAndALastingOneIsNot) {
+TEST_F(IpmiReaderTest, ANewDiagnosticIsAChangeAndALastingOneIsNot) {
     processor_.silent = true;
     EXPECT_EQ(read(), ServiceProcessor{});
     now_ += 2s;
     EXPECT_TRUE(reader_.changed());
     EXPECT_EQ(read(), ServiceProcessor{});
-    EXPECT_EQ(complaints_.size(), 1U);
+    EXPECT_EQ(diagnostics_.size(), 1U);
     now_ += 1min;
     EXPECT_FALSE(reader_.changed());
     now_ += 2s;
@@ -162,7 +163,7 @@ TEST_F(IpmiReaderTest, ANewComplaintIsAChangeAndALastingOneIsNot) {
 TEST_F(IpmiReaderTest, ADeviceThatMayNotBeOpenedIsAProcessorOfWhichNothingIsKnown) {
     processor_.openError = EACCES;
     EXPECT_EQ(read(), ServiceProcessor{});
-    EXPECT_THAT(complaints_, ElementsAre("service processor: cannot open: Permission denied"));
+    EXPECT_THAT(diagnostics_, ElementsAre("service processor: cannot open: Permission denied"));
     EXPECT_FALSE(reader_.changed());
     EXPECT_TRUE(processor_.asked.empty());
 }
@@ -170,7 +171,7 @@ TEST_F(IpmiReaderTest, ADeviceThatMayNotBeOpenedIsAProcessorOfWhichNothingIsKnow
 TEST_F(IpmiReaderTest, ADeviceThatTakesNoRequestsIsAskedAgainNextMinute) {
     processor_.sendError = ENOTTY;
     EXPECT_EQ(read(), ServiceProcessor{});
-    EXPECT_EQ(complaints_.size(), 1U);
+    EXPECT_EQ(diagnostics_.size(), 1U);
     EXPECT_FALSE(processor_.isOpen);
     processor_.sendError = 0;
     EXPECT_FALSE(reader_.changed());

@@ -8,6 +8,7 @@
 #include <chrono>
 #include <thread>
 
+#include "LinuxSupport.h"
 #include "RmcpSession.h"
 #include "Simulator.h"
 #include "ipmi/IpmiReader.h"
@@ -28,44 +29,44 @@ class IpmiSimulatorTest : public testing::Test {
     /// The LAN channel that one reader comes to know. On a machine under load a second
     /// may not be enough for the simulator: then another reader begins anew.
     static std::optional<LanChannel> lanOf(const Simulator& simulator) {
-        std::vector<std::string> complaints;
+        std::vector<std::string> diagnostics;
         for (int attempt = 0; attempt < 5; ++attempt) {
             IpmiReader reader{std::make_unique<RmcpSession>(simulator.port())};
-            complaints.clear();
-            for (int look = 0; look < 400 && complaints.empty(); ++look) {
+            diagnostics.clear();
+            for (int look = 0; look < 400 && diagnostics.empty(); ++look) {
                 std::this_thread::sleep_for(std::chrono::milliseconds{5});
-                const auto known = reader.read(complaints);
+                const auto known = reader.read(diagnostics);
                 if (known && known->lan) {
-                    EXPECT_THAT(complaints, IsEmpty());
+                    EXPECT_THAT(diagnostics, IsEmpty());
                     return known->lan;
                 }
             }
         }
-        ADD_FAILURE() << testing::PrintToString(complaints) << simulator.output();
+        ADD_FAILURE() << testing::PrintToString(diagnostics) << simulator.output();
         return std::nullopt;
     }
 };
 
 TEST_F(IpmiSimulatorTest, LeasedAddress) {
     Simulator simulator;
-    EXPECT_EQ(lanOf(simulator), (LanChannel{1, std::uint8_t{2}, "198.51.100.77"}));
+    EXPECT_EQ(lanOf(simulator), (LanChannel{1, std::uint8_t{2}, "198.51.100.77"_ip}));
 }
 
 TEST_F(IpmiSimulatorTest, EverySourceAndNoAddress) {
     Simulator simulator;
     simulator.configure("static", "192.0.2.7");
-    EXPECT_EQ(lanOf(simulator), (LanChannel{1, std::uint8_t{1}, "192.0.2.7"}));
+    EXPECT_EQ(lanOf(simulator), (LanChannel{1, std::uint8_t{1}, "192.0.2.7"_ip}));
     simulator.configure("bios", "192.0.2.8");
-    EXPECT_EQ(lanOf(simulator), (LanChannel{1, std::uint8_t{3}, "192.0.2.8"}));
+    EXPECT_EQ(lanOf(simulator), (LanChannel{1, std::uint8_t{3}, "192.0.2.8"_ip}));
     simulator.configure("other", "192.0.2.9");
-    EXPECT_EQ(lanOf(simulator), (LanChannel{1, std::uint8_t{4}, "192.0.2.9"}));
+    EXPECT_EQ(lanOf(simulator), (LanChannel{1, std::uint8_t{4}, "192.0.2.9"_ip}));
     simulator.configure("dhcp", "0.0.0.0");
-    EXPECT_EQ(lanOf(simulator), (LanChannel{1, std::uint8_t{2}, ""}));
+    EXPECT_EQ(lanOf(simulator), (LanChannel{1, std::uint8_t{2}, std::nullopt}));
 }
 
 TEST_F(IpmiSimulatorTest, LanElsewhereThanUsual) {
     Simulator simulator{8};
-    EXPECT_EQ(lanOf(simulator), (LanChannel{8, std::uint8_t{2}, "198.51.100.77"}));
+    EXPECT_EQ(lanOf(simulator), (LanChannel{8, std::uint8_t{2}, "198.51.100.77"_ip}));
 }
 
 TEST_F(IpmiSimulatorTest, AParameterThatItDoesNotHave) {

@@ -102,7 +102,7 @@ bool RmcpSession::logIn() {
     return privilege && !privilege->data.empty() && privilege->data.front() == 0;
 }
 
-std::optional<IpmiAnswer> RmcpSession::exchange(const IpmiRequest& request) {
+std::optional<IpmiResponse> RmcpSession::exchange(const IpmiRequest& request) {
     for (int attempt = 0; attempt < 50; ++attempt) {
         // Refused while nobody listens there yet.
         static_cast<void>(send(0, request));

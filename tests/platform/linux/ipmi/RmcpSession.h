@@ -24,7 +24,7 @@ class RmcpSession final : public IpmiTransport {
 
   private:
     /// Sends a request of the session's own again and again until it is answered.
-    std::optional<IpmiAnswer> exchange(const IpmiRequest& request);
+    std::optional<IpmiResponse> exchange(const IpmiRequest& request);
     bool logIn();
 
     std::uint16_t port_;

@@ -36,7 +36,7 @@ class ServiceProcessorMachineTest : public testing::Test {
         surroundings_.transport = std::make_unique<ScriptedTransport>(std::move(answers));
         surroundings_.realProcesses = false;
         surroundings_.uptime = [this] { return uptime_; };
-        surroundings_.complain = [this](std::string_view text) { complaints_.emplace_back(text); };
+        surroundings_.report = [this](std::string_view text) { diagnostics_.emplace_back(text); };
     }
 
     LiveMachine& withProcessor() {
@@ -51,7 +51,7 @@ class ServiceProcessorMachineTest : public testing::Test {
     TemporaryDirectory root_;
     ScriptedProcessor processor_ = ScriptedProcessor::withLan(1, 2, leased);
     std::chrono::steady_clock::time_point uptime_{1000h};
-    std::vector<std::string> complaints_;
+    std::vector<std::string> diagnostics_;
     Surroundings surroundings_;
     std::unique_ptr<LiveMachine> machine_;
 };
@@ -84,7 +84,7 @@ TEST_F(ServiceProcessorMachineTest, StandsBesideTheComputerWithItsInterface) {
     EXPECT_EQ(valueOf(*tree, "bmc-lan1", Properties::DHCPServerAddresses),
               PropertyValue{std::vector<std::string>{}});
     EXPECT_FALSE(machine.changed());
-    EXPECT_THAT(complaints_, IsEmpty());
+    EXPECT_THAT(diagnostics_, IsEmpty());
 }
 
 TEST_F(ServiceProcessorMachineTest, IsAskedWithoutAReading) {
@@ -135,18 +135,18 @@ TEST_F(ServiceProcessorMachineTest, ItsSilenceIsOneLine) {
         uptime_ += 1min;
         EXPECT_FALSE(machine.changed());
     }
-    EXPECT_THAT(complaints_, ElementsAre("service processor: no answer within one second"));
+    EXPECT_THAT(diagnostics_, ElementsAre("service processor: no answer within one second"));
 }
 
 TEST_F(ServiceProcessorMachineTest, WithoutItsDeviceThereIsTheComputerAlone) {
     EXPECT_THAT(computers(*open().read()), ElementsAre("Computer"));
-    EXPECT_THAT(complaints_, IsEmpty());
+    EXPECT_THAT(diagnostics_, IsEmpty());
 }
 
 TEST_F(ServiceProcessorMachineTest, ItsDeviceIsLookedForAmongTheMachinesFiles) {
     root_.write("/dev/ipmi0", "no device");
     EXPECT_THAT(computers(*open().read()), ElementsAre("Computer", "BMC"));
-    EXPECT_THAT(complaints_,
+    EXPECT_THAT(diagnostics_,
                 ElementsAre("service processor: cannot ask: Inappropriate ioctl for device"));
 }
 

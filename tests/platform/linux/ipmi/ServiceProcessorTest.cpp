@@ -27,7 +27,8 @@ TEST(ServiceProcessor, IsAComputerWithANetworkAndAnInterface) {
     expected.property(Properties::DHCPEnabled, true);
     expected.property(Properties::AddressSource, number(1));
     expected.property(Properties::DHCPServerAddresses, std::vector<std::string>{});
-    EXPECT_EQ(*treeOf({.lan = LanChannel{1, std::uint8_t{2}, "198.51.100.77"}}), *expected.build());
+    EXPECT_EQ(*treeOf({.lan = LanChannel{1, std::uint8_t{2}, "198.51.100.77"_ip}}),
+              *expected.build());
 }
 
 TEST(ServiceProcessor, WithoutALanChannelIsAComputerAlone) {
@@ -40,7 +41,7 @@ TEST(ServiceProcessor, WithoutALanChannelIsAComputerAlone) {
 TEST(ServiceProcessor, EverySourceOfAnAddressHasItsNumber) {
     const std::array<unsigned, 16> sources{0, 3, 1, 5, 5};  // reserved numbers are unknown
     for (std::uint8_t code = 0; code < sources.size(); ++code) {
-        const auto tree = treeOf({.lan = LanChannel{1, code, "192.0.2.1"}});
+        const auto tree = treeOf({.lan = LanChannel{1, code, "192.0.2.1"_ip}});
         EXPECT_EQ(valueOf(*tree, "bmc-lan1", Properties::AddressSource), number(sources.at(code)))
             << +code;
         EXPECT_EQ(valueOf(*tree, "bmc-lan1", Properties::DHCPEnabled), PropertyValue{code == 2})
@@ -49,7 +50,7 @@ TEST(ServiceProcessor, EverySourceOfAnAddressHasItsNumber) {
 }
 
 TEST(ServiceProcessor, DhcpWithoutALeaseHasNoAddress) {
-    const auto tree = treeOf({.lan = LanChannel{8, std::uint8_t{2}, ""}});
+    const auto tree = treeOf({.lan = LanChannel{8, std::uint8_t{2}, std::nullopt}});
     const auto node = interfaceNode(*tree, "bmc-lan8");
     ASSERT_NE(node, Snapshot::none);
     EXPECT_EQ(tree->find(node, Properties::IPv4Address), nullptr);
@@ -57,7 +58,7 @@ TEST(ServiceProcessor, DhcpWithoutALeaseHasNoAddress) {
 }
 
 TEST(ServiceProcessor, ASourceThatWasNotToldIsUnknownAndSaysNothingOfDhcp) {
-    const auto tree = treeOf({.lan = LanChannel{1, std::nullopt, "192.0.2.1"}});
+    const auto tree = treeOf({.lan = LanChannel{1, std::nullopt, "192.0.2.1"_ip}});
     const auto node = interfaceNode(*tree, "bmc-lan1");
     ASSERT_NE(node, Snapshot::none);
     EXPECT_EQ(tree->find(node, Properties::DHCPEnabled), nullptr);

@@ -27,9 +27,9 @@ class ChangeMonitorTest : public testing::Test {
         places_.push_back({.directory = root_.path(below), .namePrefix = prefix});
     }
     void begin() {
-        std::vector<std::string> complaints;
-        monitor_.begin(places_, complaints);
-        EXPECT_THAT(complaints, IsEmpty());
+        std::vector<std::string> diagnostics;
+        monitor_.begin(places_, diagnostics);
+        EXPECT_THAT(diagnostics, IsEmpty());
     }
     void makeDirectory(const std::string& below) const {
         std::filesystem::create_directories(root_.path(below));
@@ -392,9 +392,9 @@ TEST(ChangeMonitorKernel, LinksAndAddressesAreNoticed) {
     EXPECT_TRUE(passesInNamespaces(20, [] {
         ChangeMonitor monitor;
         const auto begin = [&] {
-            std::vector<std::string> complaints;
-            monitor.begin({}, complaints);
-            EXPECT_THAT(complaints, IsEmpty());
+            std::vector<std::string> diagnostics;
+            monitor.begin({}, diagnostics);
+            EXPECT_THAT(diagnostics, IsEmpty());
         };
         begin();
         EXPECT_FALSE(monitor.changed());
@@ -422,8 +422,8 @@ TEST(ChangeMonitorKernel, MoreNetworkEventsThanTheKernelKeepsCountAsAChange) {
     ZR_NEEDS_NAMESPACES();
     EXPECT_TRUE(passesInNamespaces(20, [] {
         ChangeMonitor monitor;
-        std::vector<std::string> complaints;
-        monitor.begin({}, complaints);
+        std::vector<std::string> diagnostics;
+        monitor.begin({}, diagnostics);
         const int fd = ::socket(AF_INET, SOCK_DGRAM | SOCK_CLOEXEC, 0);
         // The kernel keeps about 135 messages of a default socket and says ENOBUFS
         // once for all that it drops.
@@ -432,11 +432,11 @@ TEST(ChangeMonitorKernel, MoreNetworkEventsThanTheKernelKeepsCountAsAChange) {
         }
         ::close(fd);
         EXPECT_TRUE(monitor.changed());
-        monitor.begin({}, complaints);
+        monitor.begin({}, diagnostics);
         EXPECT_FALSE(monitor.changed());
         run("ip link add br0 type bridge");
         EXPECT_TRUE(monitor.changed());
-        EXPECT_THAT(complaints, IsEmpty());
+        EXPECT_THAT(diagnostics, IsEmpty());
     }));
 }
 

@@ -4,18 +4,19 @@
 #include <linux/if.h>
 #include <linux/if_arp.h>
 
+#include "LinuxSupport.h"
+
 namespace ZR::Live {
 namespace {
 
 Link linkOf(const char* kind, const char* slaveKind = "") {
-    Link link;
-    link.ifindex = 2;
-    link.name = "l";
-    link.arphrdType = ARPHRD_ETHER;
-    link.kind = kind;
-    link.slaveKind = slaveKind;
-    link.master = link.slaveKind.empty() ? 0 : 9;
-    return link;
+    return {.ifindex = 2,
+            .name = "l"_name,
+            .arphrdType = ARPHRD_ETHER,
+            .kind = kind,
+            .slaveKind = slaveKind,
+            .master = std::string_view{slaveKind}.empty() ? 0U : 9U,
+            .carrier = {}};
 }
 
 bool isActiveWith(std::uint32_t flags, std::uint8_t operstate) {

@@ -29,18 +29,16 @@ TEST(Link, EverythingThatTheKernelTells) {
     message.number(IFLA_OPERSTATE, std::uint8_t{6})
         .number(IFLA_CARRIER, std::uint8_t{1})
         .number(IFLA_MASTER, std::uint32_t{9})
-        .number(IFLA_LINK_NETNSID, std::int32_t{3})
         .text(parentDeviceName, "0000:00:03.0")
         .text(IFLA_QDISC, "fq_codel");
     EXPECT_EQ(parseLink(message.bytes()), (Link{.ifindex = 7,
-                                                .name = "eth0",
+                                                .name = "eth0"_name,
                                                 .flags = 0x11043,
                                                 .operstate = 6,
                                                 .arphrdType = 1,
                                                 .kind = "",
                                                 .slaveKind = "",
                                                 .master = 9,
-                                                .netnsid = 3,
                                                 .hasParentDevice = true,
                                                 .carrier = true}));
 }
@@ -59,7 +57,7 @@ TEST(Link, KindAndSlaveKindAreNested) {
 TEST(Link, AlternativeNamesAreNoNames) {
     Message message = linkMessage(3, "eth0");
     message.text(alternativeNames, "a-much-longer-alternative-name");
-    EXPECT_EQ(parseLink(message.bytes())->name, "eth0");
+    EXPECT_EQ(parseLink(message.bytes())->name, "eth0"_name);
 }
 
 TEST(Link, NamesThatTheKernelWouldRefuseAreRefused) {

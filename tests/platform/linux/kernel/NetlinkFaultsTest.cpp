@@ -82,22 +82,22 @@ class Kernel {
     /// Reads while the calls are as `prepare` makes them.
     std::shared_ptr<const Snapshot> read(const std::function<void(SystemCalls&)>& prepare) {
         // A kernel that is busy elsewhere may be late by itself, which is another matter.
-        complaints_.clear();
+        diagnostics_.clear();
         for (int attempt = 1;; ++attempt) {
-            const auto before = static_cast<std::ptrdiff_t>(complaints_.size());
+            const auto before = static_cast<std::ptrdiff_t>(diagnostics_.size());
             const auto tree = [&] {
                 SystemCalls calls;
                 prepare(calls);
                 return machine_.read();
             }();
             // A trouble that lasts is told once.
-            const bool late = complaint().find("in time") != std::string::npos ||
-                              complaint().find("timed out") != std::string::npos;
+            const bool late = diagnostic().find("in time") != std::string::npos ||
+                              diagnostic().find("timed out") != std::string::npos;
             if (!late || attempt == 4) {
                 return tree;
             }
             if (!machine_.changed()) {
-                complaints_.erase(complaints_.begin(), complaints_.begin() + before);
+                diagnostics_.erase(diagnostics_.begin(), diagnostics_.begin() + before);
                 return tree;
             }
         }
@@ -108,7 +108,7 @@ class Kernel {
 
     /// What can be told of the machine although something went wrong is right.
     void expectRight(const Snapshot& tree) const {
-        EXPECT_THAT(interfaceNames(tree), ElementsAre("br0", "br1")) << complaint();
+        EXPECT_THAT(interfaceNames(tree), ElementsAre("br0", "br1")) << diagnostic();
         EXPECT_EQ(valueOf(tree, "br0", Properties::IPv4Address), PropertyValue{"192.0.2.1"});
         EXPECT_EQ(valueOf(tree, "br1", Properties::IPv4Address), PropertyValue{"192.0.2.2"});
     }
@@ -116,19 +116,19 @@ class Kernel {
     /// Nothing is told, for a reason, and the trouble is not kept longer than it lasts.
     void expectNothing(const Snapshot& tree, const std::string& reason) {
         EXPECT_THAT(interfaceNames(tree), IsEmpty());
-        EXPECT_THAT(complaint(), HasSubstr(reason));
+        EXPECT_THAT(diagnostic(), HasSubstr(reason));
         expectRecovered();
     }
     void expectRecovered() {
         EXPECT_TRUE(machine_.changed()) << "it would go on telling this";
         expectRight(*read([](SystemCalls&) {}));
-        EXPECT_EQ(complaint(), "");
+        EXPECT_EQ(diagnostic(), "");
         EXPECT_FALSE(machine_.changed());
     }
 
-    [[nodiscard]] std::string complaint() const {
+    [[nodiscard]] std::string diagnostic() const {
         std::string all;
-        for (const std::string& each : complaints_) {
+        for (const std::string& each : diagnostics_) {
             all += each + '\n';
         }
         return all;
@@ -136,14 +136,14 @@ class Kernel {
     [[nodiscard]] bool changed() { return machine_.changed(); }
 
   private:
-    static Surroundings surroundings(std::vector<std::string>& complaints) {
+    static Surroundings surroundings(std::vector<std::string>& diagnostics) {
         Surroundings result;
-        result.complain = [&complaints](std::string_view text) { complaints.emplace_back(text); };
+        result.report = [&diagnostics](std::string_view text) { diagnostics.emplace_back(text); };
         return result;
     }
 
-    std::vector<std::string> complaints_;
-    LiveMachine machine_{surroundings(complaints_)};
+    std::vector<std::string> diagnostics_;
+    LiveMachine machine_{surroundings(diagnostics_)};
 };
 
 /// Runs the body with a machine of its own, where that is possible.
@@ -159,7 +159,7 @@ TEST(NetlinkFaults, WithoutAnyTheCallsReallyPass) {
     withKernel([](Kernel& kernel) {
         const auto tree = kernel.read([](SystemCalls&) {});
         kernel.expectRight(*tree);
-        EXPECT_EQ(kernel.complaint(), "");
+        EXPECT_EQ(kernel.diagnostic(), "");
         unsigned received = 0;
         unsigned sent = 0;
         kernel.read([&](SystemCalls& calls) {
@@ -219,14 +219,14 @@ SystemCalls::Receive interrupting(unsigned datagrams) {
 TEST(NetlinkFaults, AnInterruptedDumpIsAskedForAgain) {
     withKernel([](Kernel& kernel) {
         kernel.expectRight(*kernel.read(interrupting(1)));
-        EXPECT_EQ(kernel.complaint(), "");
+        EXPECT_EQ(kernel.diagnostic(), "");
     });
 }
 
 TEST(NetlinkFaults, DumpsThatAreAlwaysInterruptedAreToldAndReadAgain) {
     withKernel([](Kernel& kernel) {
         kernel.expectRight(*kernel.read(interrupting(UINT32_MAX)));
-        EXPECT_THAT(kernel.complaint(), HasSubstr("changed while they were read"));
+        EXPECT_THAT(kernel.diagnostic(), HasSubstr("changed while they were read"));
         kernel.expectRecovered();
     });
 }
@@ -249,11 +249,11 @@ TEST(NetlinkFaults, InterruptionsBySignalsAndEarlyWakingChangeNothing) {
         for (const Call call : {Call::recvmsg, Call::sendto}) {
             kernel.expectRight(
                 *kernel.read([call](SystemCalls& calls) { calls.fail(call, 1, EINTR, 5); }));
-            EXPECT_EQ(kernel.complaint(), "") << nameOf(call);
+            EXPECT_EQ(kernel.diagnostic(), "") << nameOf(call);
         }
         kernel.expectRight(
             *kernel.read([](SystemCalls& calls) { calls.fail(Call::recvmsg, 1, EAGAIN, 5); }));
-        EXPECT_EQ(kernel.complaint(), "");
+        EXPECT_EQ(kernel.diagnostic(), "");
     });
 }
 
@@ -399,7 +399,7 @@ TEST(NetlinkFaults, AttributesWhoseLengthCannotBeTrueCostTheirMessageOnly) {
                         break;
                     }
                     ++swept;
-                    EXPECT_THAT(kernel.complaint(), HasSubstr("malformed messages left out"));
+                    EXPECT_THAT(kernel.diagnostic(), HasSubstr("malformed messages left out"));
                     for (const std::string& name : interfaceNames(*tree)) {
                         EXPECT_TRUE(name == "br0" || name == "br1") << name;
                         const auto address = valueOf(*tree, name, Properties::IPv4Address);
@@ -491,7 +491,7 @@ TEST(NetlinkFaults, AQuestionThatIsSentInPartIsNone) {
             const auto tree = kernel.read([call](SystemCalls& calls) {
                 calls.fail(Call::sendto, call, SystemCalls::halfTransferred);
             });
-            EXPECT_THAT(kernel.complaint(), HasSubstr("cannot be asked for"));
+            EXPECT_THAT(kernel.diagnostic(), HasSubstr("cannot be asked for"));
             EXPECT_EQ(interfaceNames(*tree).empty(), call == 1);
             kernel.expectRecovered();
         }

@@ -56,7 +56,7 @@ class RtnetlinkReaderTest : public testing::Test {
     static std::vector<std::string> names(const NetworkState& state) {
         std::vector<std::string> names;
         for (const Link& link : state.links) {
-            names.push_back(link.name);
+            names.emplace_back(link.name.view());
         }
         return names;
     }
@@ -69,9 +69,9 @@ TEST_F(RtnetlinkReaderTest, LinksAndAddressesOfOneMoment) {
     const NetworkState state = read({someLinks(), someAddresses()});
     EXPECT_THAT(names(state), ElementsAre("lo", "eth0"));
     ASSERT_EQ(state.addresses.size(), 1U);
-    EXPECT_EQ(state.addresses[0].text, "198.51.100.7");
+    EXPECT_EQ(state.addresses[0].ip, "198.51.100.7"_ip);
     EXPECT_TRUE(state.certain);
-    EXPECT_THAT(state.complaints, IsEmpty());
+    EXPECT_THAT(state.diagnostics, IsEmpty());
     EXPECT_EQ(transport_->opened(), 1);
 }
 
@@ -104,7 +104,7 @@ TEST_F(RtnetlinkReaderTest, ADumpThatIsInterruptedAgainAndAgainIsKeptAsUncertain
     EXPECT_THAT(names(state), ElementsAre("busy"));
     EXPECT_EQ(state.addresses.size(), 1U);
     EXPECT_FALSE(state.certain);
-    EXPECT_THAT(state.complaints, ElementsAre(HasSubstr("changed while they were read")));
+    EXPECT_THAT(state.diagnostics, ElementsAre(HasSubstr("changed while they were read")));
 }
 
 TEST_F(RtnetlinkReaderTest, AnswersThatWereLostAreAskedForAgainOnANewSocket) {
@@ -121,7 +121,7 @@ TEST_F(RtnetlinkReaderTest, AnswersThatAreLostAgainAndAgainGiveNoLinks) {
     EXPECT_THAT(state.links, IsEmpty());
     EXPECT_THAT(state.addresses, IsEmpty());
     EXPECT_FALSE(state.certain);
-    EXPECT_THAT(state.complaints, ElementsAre(HasSubstr("lost")));
+    EXPECT_THAT(state.diagnostics, ElementsAre(HasSubstr("lost")));
     EXPECT_EQ(transport_->asked(), 3);
 }
 
@@ -143,7 +143,7 @@ TEST_F(RtnetlinkReaderTest, DatagramsThatNoBufferHoldsEndAfterABoundedNumberOfTr
     const std::vector<Step> cut{Step::cut({linkMessage(2, "half")})};
     const NetworkState state = read({cut, cut, cut, cut, cut, cut});
     EXPECT_THAT(state.links, IsEmpty());
-    EXPECT_THAT(state.complaints, ElementsAre(HasSubstr("longer than the buffer")));
+    EXPECT_THAT(state.diagnostics, ElementsAre(HasSubstr("longer than the buffer")));
     EXPECT_EQ(transport_->asked(), 3);
 }
 
@@ -151,7 +151,7 @@ TEST_F(RtnetlinkReaderTest, ARefusalIsFinalAndNamesItsReason) {
     const NetworkState state = read({{parts({refusal(EPERM)})}});
     EXPECT_THAT(state.links, IsEmpty());
     EXPECT_FALSE(state.certain);
-    EXPECT_THAT(state.complaints, ElementsAre("network links: refused: Operation not permitted"));
+    EXPECT_THAT(state.diagnostics, ElementsAre("network links: refused: Operation not permitted"));
     EXPECT_EQ(transport_->asked(), 1);
 }
 
@@ -165,13 +165,13 @@ TEST_F(RtnetlinkReaderTest, ARefusalWithoutItsCodeIsARefusal) {
     const Message bare{NLMSG_ERROR, 0, std::array<std::byte, 0>{}};
     const NetworkState state = read({{parts({bare})}});
     EXPECT_THAT(state.links, IsEmpty());
-    EXPECT_EQ(state.complaints.size(), 1U);
+    EXPECT_EQ(state.diagnostics.size(), 1U);
 }
 
 TEST_F(RtnetlinkReaderTest, ADumpThatEndsWithAnErrorIsNone) {
     const NetworkState state = read({{parts({linkMessage(2, "eth0"), done(-ENOMEM)})}});
     EXPECT_THAT(state.links, IsEmpty());
-    EXPECT_THAT(state.complaints, ElementsAre(HasSubstr("broken off: ")));
+    EXPECT_THAT(state.diagnostics, ElementsAre(HasSubstr("broken off: ")));
 }
 
 TEST_F(RtnetlinkReaderTest, OtherProcessesAreNotListenedTo) {
@@ -205,7 +205,7 @@ TEST_F(RtnetlinkReaderTest, EventsBetweenTheAnswersAreSkipped) {
     const NetworkState state =
         read({{parts({event, linkMessage(2, "eth0"), done()})}, someAddresses()});
     EXPECT_THAT(names(state), ElementsAre("eth0"));
-    EXPECT_THAT(state.complaints, IsEmpty());
+    EXPECT_THAT(state.diagnostics, IsEmpty());
 }
 
 TEST_F(RtnetlinkReaderTest, AMalformedMessageIsLeftOutAndReported) {
@@ -216,7 +216,7 @@ TEST_F(RtnetlinkReaderTest, AMalformedMessageIsLeftOutAndReported) {
         read({{parts({malformed, linkMessage(3, "good"), done()})}, someAddresses()});
     EXPECT_THAT(names(state), ElementsAre("good"));
     EXPECT_FALSE(state.certain);
-    EXPECT_THAT(state.complaints, ElementsAre("network links: 1 malformed messages left out"));
+    EXPECT_THAT(state.diagnostics, ElementsAre("network links: 1 malformed messages left out"));
 }
 
 TEST_F(RtnetlinkReaderTest, AMessageLongerThanItsDatagramIsLeftOutAndReported) {
@@ -240,13 +240,13 @@ TEST_F(RtnetlinkReaderTest, AMessageOfALengthWithTheHighestBitIsLeftOutAndReport
 TEST_F(RtnetlinkReaderTest, SilenceEndsAtTheDeadline) {
     const NetworkState state = read({{}}, milliseconds{60});
     EXPECT_THAT(state.links, IsEmpty());
-    EXPECT_THAT(state.complaints, ElementsAre(HasSubstr("no answer: ")));
+    EXPECT_THAT(state.diagnostics, ElementsAre(HasSubstr("no answer: ")));
 }
 
 TEST_F(RtnetlinkReaderTest, ADumpThatNeverEndsEndsAtTheDeadline) {
     const NetworkState state = read({{Step::endless({linkMessage(2, "again")})}}, milliseconds{60});
     EXPECT_THAT(state.links, IsEmpty());
-    EXPECT_THAT(state.complaints, ElementsAre(HasSubstr("no complete answer in time")));
+    EXPECT_THAT(state.diagnostics, ElementsAre(HasSubstr("no complete answer in time")));
 }
 
 // No real kernel can be made to keep a question at will; so this one does.
@@ -259,7 +259,7 @@ TEST_F(RtnetlinkReaderTest, TimeForWhichTheKernelKeepsTheQuestionIsNotTheAnswers
     EXPECT_THAT(names(state), ElementsAre("lo", "eth0"));
     EXPECT_EQ(state.addresses.size(), 1U);
     EXPECT_TRUE(state.certain);
-    EXPECT_THAT(state.complaints, IsEmpty());
+    EXPECT_THAT(state.diagnostics, IsEmpty());
 }
 
 TEST_F(RtnetlinkReaderTest, AfterTheDeadlineNothingIsAskedForAgain) {
@@ -274,7 +274,7 @@ TEST_F(RtnetlinkReaderTest, AfterTheDeadlineNothingIsAskedForAgain) {
     EXPECT_THAT(names(state), ElementsAre("busy"));
     EXPECT_EQ(state.addresses.size(), 1U);
     EXPECT_FALSE(state.certain) << "to be read again";
-    EXPECT_THAT(state.complaints, ElementsAre("network links: changed while they were read"));
+    EXPECT_THAT(state.diagnostics, ElementsAre("network links: changed while they were read"));
 }
 
 TEST_F(RtnetlinkReaderTest, AfterAFailureTheNextReadingBeginsAnew) {
@@ -289,7 +289,7 @@ TEST_F(RtnetlinkReaderTest, UnreadableAddressesLeaveTheLinks) {
     EXPECT_THAT(names(state), ElementsAre("lo", "eth0"));
     EXPECT_THAT(state.addresses, IsEmpty());
     EXPECT_FALSE(state.certain);
-    EXPECT_THAT(state.complaints, ElementsAre("network addresses: refused: Permission denied"));
+    EXPECT_THAT(state.diagnostics, ElementsAre("network addresses: refused: Permission denied"));
 }
 
 TEST_F(RtnetlinkReaderTest, AnInterruptedDumpOfAddressesIsRepeatedAlone) {
@@ -297,7 +297,7 @@ TEST_F(RtnetlinkReaderTest, AnInterruptedDumpOfAddressesIsRepeatedAlone) {
     const NetworkState state =
         read({someLinks(), {parts({addressMessage(2, {192, 0, 2, 1}), end})}, someAddresses()});
     ASSERT_EQ(state.addresses.size(), 1U);
-    EXPECT_EQ(state.addresses[0].text, "198.51.100.7");
+    EXPECT_EQ(state.addresses[0].ip, "198.51.100.7"_ip);
     EXPECT_TRUE(state.certain);
     EXPECT_EQ(transport_->asked(), 3);
 }
@@ -308,7 +308,7 @@ TEST_F(RtnetlinkReaderTest, AddressesThatWereLostAreAskedForAgain) {
               {parts({addressMessage(2, {192, 0, 2, 1})}), Step::failing(ENOBUFS)},
               someAddresses()});
     ASSERT_EQ(state.addresses.size(), 1U);
-    EXPECT_EQ(state.addresses[0].text, "198.51.100.7");
+    EXPECT_EQ(state.addresses[0].ip, "198.51.100.7"_ip);
     EXPECT_TRUE(state.certain);
 }
 
@@ -317,7 +317,7 @@ TEST_F(RtnetlinkReaderTest, EveryRefusalLeavesNoLinksAndIsUncertain) {
         const NetworkState state = read({{parts({refusal(code)})}});
         EXPECT_THAT(state.links, IsEmpty()) << code;
         EXPECT_FALSE(state.certain) << code;
-        EXPECT_THAT(state.complaints, ElementsAre(HasSubstr("network links: "))) << code;
+        EXPECT_THAT(state.diagnostics, ElementsAre(HasSubstr("network links: "))) << code;
     }
 }
 
@@ -369,7 +369,7 @@ TEST_F(RtnetlinkReaderTest, ASocketThatCannotBeOpenedIsAReason) {
     RtnetlinkReader reader{std::move(transport)};
     const NetworkState state = reader.read(steady_clock::now() + milliseconds{200});
     EXPECT_THAT(state.links, IsEmpty());
-    EXPECT_THAT(state.complaints, ElementsAre(HasSubstr("cannot be asked for: ")));
+    EXPECT_THAT(state.diagnostics, ElementsAre(HasSubstr("cannot be asked for: ")));
 }
 
 }  // namespace

@@ -24,8 +24,8 @@ TEST(UdpSockets, OnlyThoseOfTheClientPort) {
             "  142: 076433C6:0044 016433C6:0043 01 00000000:00000000 00:00000000 00000000     0\n"
             "  143: 00000000:0044 00000000:0000 07 00000000:00000000 00:00000000 00000000     0\n"
             "  144: 00000000:0043 00000000:0000 07 00000000:00000000 00:00000000 00000000     0\n"),
-        ElementsAre(PortSocket{.address = "198.51.100.7", .peer = "198.51.100.1"},
-                    PortSocket{.address = "", .peer = ""}));
+        ElementsAre(PortSocket{.address = "198.51.100.7"_ip, .peer = "198.51.100.1"_ip},
+                    PortSocket{.address = {}, .peer = {}}));
 }
 
 TEST(UdpSockets, AnyTextGivesFacts) {
@@ -48,15 +48,17 @@ TEST(PacketLinks, EachLinkOnceWhereIPv4IsHeard) {
 
 TEST(Sockets, WithoutAProcessFileSystemThereAreNone) {
     const TemporaryDirectory root;
-    EXPECT_EQ(readWith(readSockets, root), ClientFacts{});
+    std::vector<std::string> diagnostics;
+    EXPECT_EQ(readSockets({.files = root.path(), .proc = root.path("/proc")}, diagnostics),
+              ClientSockets{});
+    EXPECT_THAT(diagnostics, IsEmpty());
 }
 
 TEST(Sockets, OfARealKernel) {
     ZR_NEEDS_NAMESPACES();
     EXPECT_TRUE(passesInNamespaces(30, [] {
-        ClientFacts before;
-        readSockets({}, before);
-        EXPECT_EQ(before, ClientFacts{});
+        std::vector<std::string> diagnostics;
+        EXPECT_EQ(readSockets({}, diagnostics), ClientSockets{});
 
         run("ip link set lo up");
         const UniqueFd client{::socket(AF_INET, SOCK_DGRAM | SOCK_CLOEXEC, 0)};
@@ -75,12 +77,11 @@ TEST(Sockets, OfARealKernel) {
         const UniqueFd listener{
             ::socket(AF_PACKET, SOCK_RAW | SOCK_CLOEXEC, htons(std::uint16_t{ETH_P_ALL}))};
         ASSERT_TRUE(listener);
-        ClientFacts facts;
-        readSockets({}, facts);
-        EXPECT_THAT(facts.sockets,
-                    ElementsAre(PortSocket{.address = "127.0.0.1", .peer = "127.0.0.2"}));
-        EXPECT_THAT(facts.packetLinks, IsEmpty()) << "it hears all links";
-        EXPECT_THAT(facts.complaints, IsEmpty());
+        const ClientSockets sockets = readSockets({}, diagnostics);
+        EXPECT_THAT(sockets.bound,
+                    ElementsAre(PortSocket{.address = "127.0.0.1"_ip, .peer = "127.0.0.2"_ip}));
+        EXPECT_THAT(sockets.packetLinks, IsEmpty()) << "it hears all links";
+        EXPECT_THAT(diagnostics, IsEmpty());
     }));
 }
 

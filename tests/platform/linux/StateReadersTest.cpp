@@ -1,4 +1,4 @@
-#include "clients/Clients.h"
+#include "StateReaders.h"
 
 #include <gtest/gtest.h>
 
@@ -10,15 +10,15 @@
 namespace ZR::Live {
 namespace {
 
-TEST(ClientSources, ProcessesAreReadFirst) {
-    ASSERT_FALSE(clientSources().empty());
-    EXPECT_EQ(clientSources().front().read, &readProcesses);
+TEST(StateReaders, ProcessesAreReadFirst) {
+    ASSERT_FALSE(stateReaders().empty());
+    EXPECT_EQ(stateReaders().front().read, &readProcesses);
 }
 
-TEST(ClientSources, EachPlaceIsAnAbsoluteDirectoryAndStandsOnce) {
+TEST(StateReaders, EachPlaceIsAnAbsoluteDirectoryAndStandsOnce) {
     std::set<std::pair<std::string_view, std::string_view>> places;
-    for (const ClientSource& source : clientSources()) {
-        for (const ClientPlace& place : source.places) {
+    for (const StateReader& reader : stateReaders()) {
+        for (const StatePlace& place : reader.places) {
             EXPECT_TRUE(place.directory.starts_with('/')) << place.directory;
             EXPECT_FALSE(place.directory.ends_with('/')) << place.directory;
             EXPECT_TRUE(places.emplace(place.directory, place.namePrefix).second)
@@ -28,12 +28,12 @@ TEST(ClientSources, EachPlaceIsAnAbsoluteDirectoryAndStandsOnce) {
     EXPECT_FALSE(places.empty());
 }
 
-TEST(ClientSources, OnAnEmptyMachineTheyFindNothing) {
+TEST(StateReaders, OnAnEmptyMachineTheyFindNothing) {
     const TemporaryDirectory root;
     std::filesystem::create_directories(root.path("/proc/thread-self/ns"));
     ClientFacts facts;
-    for (const ClientSource& source : clientSources()) {
-        source.read({.files = root.path(), .proc = root.path("/proc")}, facts);
+    for (const StateReader& reader : stateReaders()) {
+        reader.read({.files = root.path(), .proc = root.path("/proc")}, facts);
     }
     EXPECT_EQ(facts, ClientFacts{});
 }

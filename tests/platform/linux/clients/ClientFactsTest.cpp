@@ -1,4 +1,4 @@
-#include "clients/Lease.h"
+#include "clients/ClientFacts.h"
 
 #include <gtest/gtest.h>
 
@@ -32,7 +32,7 @@ TEST(ClientFacts, AManagerOfAnotherNamespaceDoesNotRunHere) {
 TEST(ClientFacts, SocketsStandAloneWhereNoProgramThatCouldHaveThemIsSeen) {
     ClientFacts facts;
     EXPECT_FALSE(facts.socketsStandAlone());
-    facts.sockets = {{.address = "192.0.2.7", .peer = ""}};
+    facts.sockets.bound = {{.address = "192.0.2.7"_ip, .peer = {}}};
     EXPECT_TRUE(facts.socketsStandAlone());
     facts.managers = running(Client::Networkd, ManagerProcess::Where::Elsewhere).managers;
     facts.processes = {{.client = Client::Dhcp6c, .interfaces = {}, .leaseFile = "", .ipv6 = true}};
@@ -56,17 +56,10 @@ TEST(ClientFacts, AManagerRunsElsewhereWhereItRunsInNoOtherPlace) {
 
 TEST(ClientProcesses, WithoutAnInterfaceTheyServeAll) {
     ClientProcess process{.client = Client::Dhclient, .interfaces = {}, .leaseFile = ""};
-    EXPECT_TRUE(process.serves("eth1"));
-    process.interfaces = {"eth2", "eth3"};
-    EXPECT_TRUE(process.serves("eth3"));
-    EXPECT_FALSE(process.serves("eth1"));
-}
-
-TEST(WatchedPlaces, AShorterPrefixCoversALongerOne) {
-    const WatchedPlace place{.directory = "/d", .namePrefix = "a"};
-    EXPECT_TRUE(place.covers({.directory = "/d", .namePrefix = "ab"}));
-    EXPECT_FALSE(place.covers({.directory = "/d", .namePrefix = ""}));
-    EXPECT_FALSE(place.covers({.directory = "/e", .namePrefix = "a"}));
+    EXPECT_TRUE(process.serves("eth1"_name));
+    process.interfaces = {"eth2"_name, "eth3"_name};
+    EXPECT_TRUE(process.serves("eth3"_name));
+    EXPECT_FALSE(process.serves("eth1"_name));
 }
 
 }  // namespace

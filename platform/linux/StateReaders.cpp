@@ -1,0 +1,83 @@
+#include "StateReaders.h"
+
+#include <array>
+
+#include "clients/Connman.h"
+#include "clients/Dhclient.h"
+#include "clients/Dhcpcd.h"
+#include "clients/Ipconfig.h"
+#include "clients/NetworkManager.h"
+#include "clients/Networkd.h"
+#include "clients/Processes.h"
+#include "clients/Udhcpc.h"
+#include "clients/Wicked.h"
+#include "configuration/Ifcfg.h"
+#include "configuration/Ifupdown.h"
+#include "configuration/KernelBoot.h"
+#include "configuration/Netplan.h"
+#include "kernel/Sockets.h"
+
+namespace ZR::Live {
+namespace {
+
+// Nothing tells of a process that starts; but most clients write its number before long.
+constexpr std::string_view pidDirectory = "/run";
+
+constexpr std::array networkdPlaces{StatePlace{networkdLinksDirectory, ""},
+                                    StatePlace{networkdLeasesDirectory, ""}};
+constexpr std::array networkManagerPlaces{
+    StatePlace{networkManagerDevices, ""}, StatePlace{networkManagerState, "internal-"},
+    StatePlace{networkManagerProfiles[0], ""}, StatePlace{networkManagerProfiles[1], ""},
+    StatePlace{networkManagerProfiles[2], ""}};
+constexpr std::array wickedPlaces{StatePlace{wickedDirectories[0], wickedLeasePrefix},
+                                  StatePlace{wickedDirectories[1], wickedLeasePrefix}};
+constexpr std::array connmanPlaces{StatePlace{connmanDirectory, ""}};
+constexpr std::array dhclientPlaces{StatePlace{dhclientDirectories[0].path, dhclientNamePrefix},
+                                    StatePlace{dhclientDirectories[1].path, dhclientNamePrefix},
+                                    StatePlace{dhclientDirectories[2].path, dhclientNamePrefix},
+                                    StatePlace{dracutDirectory, dracutPrefix},
+                                    StatePlace{pidDirectory, dhclientNamePrefix}};
+constexpr std::array dhcpcdPlaces{
+    StatePlace{dhcpcdDirectories[0].path, dhcpcdDirectories[0].namePrefix},
+    StatePlace{dhcpcdDirectories[1].path, dhcpcdDirectories[1].namePrefix},
+    StatePlace{dhcpcdDirectories[2].path, dhcpcdDirectories[2].namePrefix},
+    StatePlace{"/run/dhcpcd", ""}};
+constexpr std::array udhcpcPlaces{StatePlace{udhcpcStateDirectory, udhcpcStatePrefix}};
+constexpr std::array ipconfigPlaces{StatePlace{ipconfigDirectory, ipconfigPrefix}};
+constexpr std::array dhcp6cPlaces{StatePlace{pidDirectory, "dhcp6c"}};
+constexpr std::array netplanPlaces{StatePlace{netplanDirectory, ""}};
+constexpr std::array ifupdownPlaces{StatePlace{ifupdownDirectory, ifupdownFile},
+                                    StatePlace{ifupdownStateDirectory, ifupdownStateFile}};
+constexpr std::array ifcfgPlaces{StatePlace{ifcfgDirectories[0], ifcfgPrefix},
+                                 StatePlace{ifcfgDirectories[1], ifcfgPrefix}};
+
+void addSockets(const Roots& roots, ClientFacts& facts) {
+    facts.sockets = readSockets(roots, facts.diagnostics);
+}
+
+// Managers before the clients that they may start, and those before what is left of
+// the boot. The files of /proc cannot be watched.
+constexpr std::array readers{
+    StateReader{readProcesses, dhcp6cPlaces},
+    StateReader{readNetworkd, networkdPlaces},
+    StateReader{readNetworkManager, networkManagerPlaces},
+    StateReader{readWicked, wickedPlaces},
+    StateReader{readConnman, connmanPlaces},
+    StateReader{readDhclient, dhclientPlaces},
+    StateReader{readDhcpcd, dhcpcdPlaces},
+    StateReader{readUdhcpc, udhcpcPlaces},
+    StateReader{readIpconfig, ipconfigPlaces},
+    StateReader{readKernelBoot, {}},
+    StateReader{readNetplan, netplanPlaces},
+    StateReader{readIfupdown, ifupdownPlaces},
+    StateReader{readIfcfg, ifcfgPlaces},
+    StateReader{addSockets, {}},
+};
+
+}  // namespace
+
+std::span<const StateReader> stateReaders() noexcept {
+    return readers;
+}
+
+}  // namespace ZR::Live

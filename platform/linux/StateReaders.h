@@ -1,0 +1,28 @@
+#pragma once
+
+#include <span>
+#include <string_view>
+
+#include "clients/ClientFacts.h"
+#include "formats/Roots.h"
+
+namespace ZR::Live {
+
+/// A directory in which files of one program lie, and how their names begin.
+struct StatePlace {
+    std::string_view directory;
+    std::string_view namePrefix;
+};
+
+/// What reads one kind of state, and the places where its files lie.
+struct StateReader {
+    void (*read)(const Roots& roots, ClientFacts& facts);
+    std::span<const StatePlace> places;
+};
+
+/// All of them, in the order in which they are to be called. Of two equal claims, the
+/// one that was read first counts. Processes come first: other readers need to know which
+/// programs run.
+[[nodiscard]] std::span<const StateReader> stateReaders() noexcept;
+
+}  // namespace ZR::Live

@@ -1,0 +1,44 @@
+#pragma once
+
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "clients/BootResponse.h"
+#include "clients/Lease.h"
+#include "clients/LinkConfiguration.h"
+#include "clients/RunningPrograms.h"
+#include "kernel/Sockets.h"
+#include "kernel/WatchedPlace.h"
+
+namespace ZR::Live {
+
+/// Everything that the clients' processes and files, and the files of their
+/// configuration, say.
+struct ClientFacts {
+    std::vector<Lease> leases;
+    std::vector<LinkConfiguration> managements;     ///< of programs that run now
+    std::vector<LinkConfiguration> configurations;  ///< of files that such programs would read
+    std::vector<ClientProcess> processes;
+    std::vector<ManagerProcess> managers;
+    ClientSockets sockets;
+    std::optional<BootResponse> boot;
+    std::vector<WatchedPlace> places;  ///< what was read beyond the fixed places
+    std::vector<std::string> diagnostics;
+
+    /// Whether a program that manages links runs for this network namespace. One
+    /// whose namespace is hidden is believed: the files that it left are beside ours.
+    [[nodiscard]] bool runs(Client client) const noexcept;
+
+    /// Whether the sockets may be all that there is to see of a DHCPv4 client: no program
+    /// that could have them was found for this network namespace.
+    [[nodiscard]] bool socketsStandAlone() const noexcept;
+
+    /// Whether such a program runs for other network namespaces alone: the indexes in
+    /// its files are then those of other links.
+    [[nodiscard]] bool runsElsewhere(Client client) const noexcept;
+
+    bool operator==(const ClientFacts&) const = default;
+};
+
+}  // namespace ZR::Live

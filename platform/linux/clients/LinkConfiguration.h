@@ -1,0 +1,31 @@
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "clients/Client.h"
+#include "formats/InterfaceName.h"
+#include "formats/IpAddress.h"
+
+namespace ZR::Live {
+
+/// What a program that manages a link, or a configuration file for such a program,
+/// says about how the link gets its addresses. It names the link by index or by name.
+struct LinkConfiguration {
+    Client client{};
+    std::uint32_t ifindex = 0;                     ///< 0 when it names the link by name
+    std::optional<InterfaceName> interfaceName{};  ///< nullopt when it names the link by index
+    std::optional<bool> dhcp4;  ///< nullopt when it does not tell, or cannot be read
+    std::optional<bool> dhcp6;
+    std::vector<IpAddress> staticAddresses;  ///< of IPv4
+    bool linkLocal4 = false;                 ///< takes an address of 169.254/16 (RFC 3927)
+    bool bootp4 = false;                     ///< asks by BOOTP (RFC 951), without DHCP
+    bool other4 = false;                     ///< by another protocol, or shares the link
+    std::string origin{};                    ///< the file that says so
+
+    bool operator==(const LinkConfiguration&) const = default;
+};
+
+}  // namespace ZR::Live

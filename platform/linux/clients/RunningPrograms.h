@@ -1,0 +1,37 @@
+#pragma once
+
+#include <cstdint>
+#include <string>
+#include <vector>
+
+#include "clients/Client.h"
+#include "formats/InterfaceName.h"
+
+namespace ZR::Live {
+
+/// A running DHCP client of this network namespace.
+struct ClientProcess {
+    Client client{};
+    std::vector<InterfaceName> interfaces;  ///< empty: every link that can broadcast
+    std::string leaseFile;                  ///< empty: the client's default
+    bool ipv6 = false;                      ///< DHCPv6 in place of DHCPv4
+    std::int32_t pid = 0;                   ///< process number; 0 before it is known
+
+    /// Whether it was told to serve this interface, or all.
+    [[nodiscard]] bool serves(const InterfaceName& interface) const noexcept;
+
+    bool operator==(const ClientProcess&) const = default;
+};
+
+/// A running program that manages links, of this network namespace or another.
+struct ManagerProcess {
+    enum class Where : std::uint8_t { Here, Elsewhere, Unknown };
+
+    Client client{};
+    Where where = Where::Unknown;
+    std::int32_t pid = 0;
+
+    bool operator==(const ManagerProcess&) const = default;
+};
+
+}  // namespace ZR::Live
