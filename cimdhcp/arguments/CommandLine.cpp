@@ -9,8 +9,8 @@
 #include "arguments/HelpFormatter.h"
 #include "arguments/OptionGroups.h"
 #include "arguments/ServeOptions.h"
-#include "client/Failure.h"
 #include "text/DisplayText.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 

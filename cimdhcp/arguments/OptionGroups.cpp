@@ -3,8 +3,8 @@
 #include <map>
 #include <string>
 
-#include "client/Failure.h"
 #include "commands/ClientCommands.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 

@@ -4,8 +4,8 @@
 #include <string_view>
 
 #include "cimom/ObjectPathText.h"
-#include "client/Failure.h"
 #include "text/DisplayText.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 

@@ -2,7 +2,7 @@
 
 #include <nlohmann/json.hpp>
 
-#include "text/JsonFormat.h"
+#include "text/JsonText.h"
 
 namespace cimdhcp {
 

@@ -7,11 +7,11 @@
 #include <vector>
 
 #include "cimom/ObjectManager.h"
-#include "client/Answer.h"
 #include "client/ClassList.h"
 #include "client/ClassLookup.h"
-#include "client/Failure.h"
-#include "commands/MachineOverview.h"
+#include "client/MachineInterfaces.h"
+#include "client/Response.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 

@@ -12,8 +12,8 @@
 #include <system_error>
 
 #include "cimom/Cim.h"
-#include "client/Failure.h"
 #include "text/DisplayText.h"
+#include "text/Failure.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace cimdhcp {

@@ -4,8 +4,8 @@
 #include <string>
 #include <vector>
 
-#include "arguments/Directories.h"
 #include "client/Client.h"
+#include "client/Installation.h"
 
 namespace cimdhcp {
 

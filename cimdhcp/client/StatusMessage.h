@@ -4,7 +4,7 @@
 #include <string_view>
 
 #include "cimom/Cim.h"
-#include "client/Answer.h"
+#include "client/Response.h"
 
 namespace cimdhcp {
 

@@ -11,11 +11,11 @@
 #include <utility>
 #include <variant>
 
-#include "arguments/PlatformSetup.h"
 #include "client/EmbeddedClient.h"
-#include "client/Failure.h"
 #include "commands/HiddenClients.h"
+#include "commands/PlatformSetup.h"
 #include "text/DisplayText.h"
+#include "text/Failure.h"
 #include "zrclient/InstrumentationService.h"
 #include "zrcommon/PlatformSettings.h"
 

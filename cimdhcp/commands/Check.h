@@ -3,7 +3,7 @@
 #include <vector>
 
 #include "arguments/CommandLine.h"
-#include "arguments/Directories.h"
+#include "client/Installation.h"
 #include "commands/Findings.h"
 
 namespace cimdhcp {

@@ -6,16 +6,16 @@
 #include <variant>
 
 #include "client/ClassList.h"
-#include "commands/CimCommands.h"
+#include "client/MachineInterfaces.h"
 #include "commands/Graph.h"
 #include "commands/GraphDrawing.h"
-#include "commands/MachineOverview.h"
+#include "commands/Operations.h"
 #include "commands/Overview.h"
 #include "commands/Rename.h"
-#include "text/AnswerOrder.h"
-#include "text/JsonFormat.h"
+#include "commands/ResponseOrder.h"
+#include "commands/ResponseText.h"
+#include "text/JsonText.h"
 #include "text/MofFormat.h"
-#include "text/TableFormat.h"
 
 namespace cimdhcp {
 

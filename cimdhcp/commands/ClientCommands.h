@@ -5,7 +5,7 @@
 
 #include "arguments/CommandLine.h"
 #include "client/Client.h"
-#include "client/Failure.h"
+#include "text/Failure.h"
 #include "text/Presentation.h"
 
 namespace cimdhcp {

@@ -3,7 +3,7 @@
 #include <algorithm>
 #include <nlohmann/json.hpp>
 
-#include "text/JsonFormat.h"
+#include "text/JsonText.h"
 
 namespace cimdhcp {
 

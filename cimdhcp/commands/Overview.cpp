@@ -4,7 +4,7 @@
 #include <nlohmann/json.hpp>
 
 #include "text/DisplayText.h"
-#include "text/JsonFormat.h"
+#include "text/JsonText.h"
 
 namespace cimdhcp {
 

@@ -6,7 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "commands/MachineOverview.h"
+#include "client/MachineInterfaces.h"
 #include "text/Columns.h"
 #include "text/Style.h"
 

@@ -1,8 +1,8 @@
 #pragma once
 
 #include "arguments/CommandLine.h"
-#include "client/Failure.h"
 #include "commands/Program.h"
+#include "text/Failure.h"
 #include "text/Presentation.h"
 
 namespace cimdhcp {

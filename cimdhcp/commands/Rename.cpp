@@ -5,10 +5,10 @@
 #include <variant>
 #include <vector>
 
-#include "client/Failure.h"
-#include "commands/ConfigurationFile.h"
+#include "commands/RenameFiles.h"
 #include "text/DisplayText.h"
-#include "text/JsonFormat.h"
+#include "text/Failure.h"
+#include "text/JsonText.h"
 #include "zrcommon/File.h"
 #include "zrcommon/Strings.h"
 

@@ -13,8 +13,8 @@
 #include <system_error>
 #include <thread>
 
-#include "client/Failure.h"
 #include "text/DisplayText.h"
+#include "text/Failure.h"
 #include "tklogger/TKLogger.h"
 #include "wbem/Server.h"
 #include "zrcommon/File.h"

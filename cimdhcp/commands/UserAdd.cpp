@@ -7,8 +7,8 @@
 #include <stdexcept>
 #include <string>
 
-#include "client/Failure.h"
 #include "text/DisplayText.h"
+#include "text/Failure.h"
 #include "wbem/Users.h"
 
 namespace cimdhcp {

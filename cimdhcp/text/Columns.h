@@ -6,7 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "text/SortOrder.h"
+#include "text/NaturalOrder.h"
 #include "text/Table.h"
 
 namespace cimdhcp {

@@ -5,8 +5,8 @@
 #include <variant>
 
 #include "cimom/ObjectPathText.h"
+#include "text/MofText.h"
 #include "text/ValueMeaning.h"
-#include "text/ValueText.h"
 
 namespace cimdhcp {
 

@@ -4,7 +4,7 @@
 
 #include "text/DisplayText.h"
 #include "text/InstanceMeanings.h"
-#include "text/ValueText.h"
+#include "text/MofText.h"
 
 namespace cimdhcp {
 

@@ -2,8 +2,8 @@
 
 #include <string>
 
-#include "client/Answer.h"
 #include "client/ClassLookup.h"
+#include "client/Response.h"
 
 namespace cimdhcp {
 

@@ -3,8 +3,8 @@
 #include <gtest/gtest.h>
 
 #include "cimom/ObjectPathText.h"
-#include "client/Failure.h"
 #include "kit/SmallSchema.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 namespace {

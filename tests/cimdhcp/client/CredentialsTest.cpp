@@ -5,10 +5,10 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include "client/Failure.h"
 #include "kit/ChildProcess.h"
 #include "kit/Files.h"
 #include "kit/TemporaryDirectory.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 namespace {

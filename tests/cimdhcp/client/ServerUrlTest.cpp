@@ -5,9 +5,9 @@
 
 #include <sstream>
 
-#include "client/Failure.h"
 #include "kit/Files.h"
 #include "kit/TemporaryDirectory.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 namespace {

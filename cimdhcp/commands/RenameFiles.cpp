@@ -1,4 +1,4 @@
-#include "commands/ConfigurationFile.h"
+#include "commands/RenameFiles.h"
 
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -11,7 +11,7 @@
 #include <string_view>
 #include <vector>
 
-#include "client/Failure.h"
+#include "text/Failure.h"
 #include "zrcommon/PropertyFile.h"
 #include "zrcommon/UniqueFd.h"
 

@@ -1,11 +1,11 @@
-#include "text/SortOrder.h"
+#include "text/NaturalOrder.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
 #include <algorithm>
 
-#include "client/Failure.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 namespace {

@@ -3,7 +3,7 @@
 #include <nlohmann/json_fwd.hpp>
 #include <string>
 
-#include "client/Answer.h"
+#include "client/Response.h"
 
 namespace cimdhcp {
 

@@ -1,4 +1,4 @@
-#include "text/JsonFormat.h"
+#include "text/JsonText.h"
 
 #include <gtest/gtest.h>
 

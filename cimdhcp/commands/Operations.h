@@ -2,8 +2,8 @@
 
 #include "arguments/CommandLine.h"
 #include "cimom/Cim.h"
-#include "client/Answer.h"
 #include "client/Client.h"
+#include "client/Response.h"
 
 namespace cimdhcp {
 

@@ -1,11 +1,11 @@
-#include "commands/CimCommands.h"
+#include "commands/Operations.h"
 
 #include <utility>
 
 #include "arguments/PathArgument.h"
 #include "arguments/ValueReading.h"
-#include "client/Failure.h"
 #include "text/DisplayText.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 

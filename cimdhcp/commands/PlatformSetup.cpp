@@ -1,4 +1,4 @@
-#include "arguments/PlatformSetup.h"
+#include "commands/PlatformSetup.h"
 
 #include <cerrno>
 #include <cstdlib>
@@ -8,8 +8,8 @@
 #include <ostream>
 #include <system_error>
 
-#include "client/Failure.h"
 #include "text/DisplayText.h"
+#include "text/Failure.h"
 #include "zrclient/InstrumentationService.h"
 #include "zrcommon/File.h"
 #include "zrcommon/PlatformSettings.h"

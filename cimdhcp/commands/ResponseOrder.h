@@ -2,7 +2,7 @@
 
 #include <string>
 
-#include "client/Answer.h"
+#include "client/Response.h"
 
 namespace cimdhcp {
 

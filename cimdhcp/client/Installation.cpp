@@ -1,9 +1,9 @@
-#include "arguments/Directories.h"
+#include "client/Installation.h"
 
 #include <algorithm>
 #include <system_error>
 
-#include "client/Failure.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 

@@ -1,4 +1,4 @@
-#include "text/ValueText.h"
+#include "text/MofText.h"
 
 #include <algorithm>
 #include <array>

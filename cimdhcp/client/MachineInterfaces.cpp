@@ -1,4 +1,4 @@
-#include "commands/MachineOverview.h"
+#include "client/MachineInterfaces.h"
 
 #include <algorithm>
 #include <cstdint>

@@ -1,4 +1,4 @@
-#include "commands/ConfigurationFile.h"
+#include "commands/RenameFiles.h"
 
 #include <gtest/gtest.h>
 #include <sys/resource.h>
@@ -8,10 +8,10 @@
 #include <csignal>
 #include <filesystem>
 
-#include "client/Failure.h"
 #include "kit/ChildProcess.h"
 #include "kit/Files.h"
 #include "kit/TemporaryDirectory.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 namespace {

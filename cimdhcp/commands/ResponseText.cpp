@@ -1,4 +1,4 @@
-#include "text/TableFormat.h"
+#include "commands/ResponseText.h"
 
 #include <algorithm>
 

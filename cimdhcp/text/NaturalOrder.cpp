@@ -1,10 +1,10 @@
-#include "text/SortOrder.h"
+#include "text/NaturalOrder.h"
 
 #include <algorithm>
 
 #include "cimom/Cim.h"
-#include "client/Failure.h"
 #include "text/DisplayText.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 

@@ -1,4 +1,4 @@
-#include "text/AnswerOrder.h"
+#include "commands/ResponseOrder.h"
 
 #include <algorithm>
 #include <optional>
@@ -6,7 +6,7 @@
 
 #include "cimom/ObjectPathText.h"
 #include "text/InstanceMeanings.h"
-#include "text/SortOrder.h"
+#include "text/NaturalOrder.h"
 
 namespace cimdhcp {
 

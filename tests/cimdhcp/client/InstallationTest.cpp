@@ -1,12 +1,12 @@
-#include "arguments/Directories.h"
+#include "client/Installation.h"
 
 #include <gtest/gtest.h>
 
 #include <filesystem>
 
-#include "client/Failure.h"
 #include "kit/Files.h"
 #include "kit/TemporaryDirectory.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 namespace {

@@ -4,8 +4,8 @@
 #include <optional>
 #include <string>
 
-#include "client/Answer.h"
 #include "client/ClassLookup.h"
+#include "client/Response.h"
 #include "text/Style.h"
 
 namespace cimdhcp {

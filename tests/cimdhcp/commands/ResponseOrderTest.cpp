@@ -1,9 +1,9 @@
-#include "text/AnswerOrder.h"
+#include "commands/ResponseOrder.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "client/Failure.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 namespace {
