@@ -7,11 +7,8 @@
 
 namespace cimdhcp {
 
-namespace {
-
 namespace fs = std::filesystem;
 
-/// A schema is there when there is a MOF file.
 bool hasSchema(const fs::path& directory) {
     std::error_code error;
     const fs::directory_iterator files(directory, error);
@@ -19,16 +16,6 @@ bool hasSchema(const fs::path& directory) {
         return entry.path().extension() == ".mof";
     });
 }
-
-void requireDirectory(const fs::path& directory, const char* option, const char* variable) {
-    std::error_code error;
-    if (!fs::is_directory(directory, error)) {
-        throw Failure(ExitStatus::notLoaded, directory.string() + ": no such directory (from " +
-                                                 option + " or " + variable + ")");
-    }
-}
-
-}  // namespace
 
 std::vector<Directories> installations(const fs::path& executable) {
     const fs::path prefix = executable.parent_path().parent_path();
@@ -40,39 +27,6 @@ std::vector<Directories> installations(const fs::path& executable) {
     }
     const fs::path configured = CIMDHCP_FULL_DATADIR "/dhcp-client-provider/schema";
     return {own, {configured, configured, {CIMDHCP_FULL_LIBDIR "/cmpi"}}};
-}
-
-Directories findDirectories(const Options& options, const std::vector<Directories>& installations) {
-    const auto found =
-        std::find_if(installations.begin(), installations.end(),
-                     [](const Directories& place) { return hasSchema(place.schema); });
-    Directories result;
-    if (found != installations.end()) {
-        result = *found;
-    } else if (!options.schemaDir || !options.providerDir) {
-        std::string places;
-        for (const Directories& place : installations) {
-            places += (places.empty() ? "" : ", ") + place.schema.string();
-        }
-        throw Failure(ExitStatus::notLoaded,
-                      "no schema found in " + places +
-                          "; --schema-dir and --provider-dir can name where they are");
-    }
-    if (options.schemaDir) {
-        requireDirectory(*options.schemaDir, "--schema-dir", "CIMDHCP_SCHEMA_DIR");
-        // The registrations lie beside the schema if nothing else is said.
-        result.schema = result.registrations = *options.schemaDir;
-    }
-    if (options.registrationDir) {
-        requireDirectory(*options.registrationDir, "--registration-dir",
-                         "CIMDHCP_REGISTRATION_DIR");
-        result.registrations = *options.registrationDir;
-    }
-    if (options.providerDir) {
-        requireDirectory(*options.providerDir, "--provider-dir", "CIMDHCP_PROVIDER_DIR");
-        result.providers = {*options.providerDir};
-    }
-    return result;
 }
 
 fs::path executableFile() {

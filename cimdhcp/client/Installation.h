@@ -1,11 +1,7 @@
 #pragma once
 
 #include <filesystem>
-#include <optional>
-#include <string>
 #include <vector>
-
-#include "arguments/CommandLine.h"
 
 namespace cimdhcp {
 
@@ -23,11 +19,8 @@ struct Directories {
 /// the form of, too), then the one that the program was configured for.
 [[nodiscard]] std::vector<Directories> installations(const std::filesystem::path& executable);
 
-/// The first installation with a schema; what the options name takes the place of
-/// its parts. Throws Failure that names the places looked at when there is none,
-/// or when a directory that an option names does not exist.
-[[nodiscard]] Directories findDirectories(const Options& options,
-                                          const std::vector<Directories>& installations);
+/// Whether a directory has a MOF file. False for one that cannot be read.
+[[nodiscard]] bool hasSchema(const std::filesystem::path& directory);
 
 /// The file of this process' program. Throws Failure.
 [[nodiscard]] std::filesystem::path executableFile();

@@ -2,6 +2,7 @@
 
 #include <optional>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "cimom/Cim.h"
@@ -10,11 +11,24 @@
 
 namespace cimdhcp {
 
-class Client;
+/// The systems that interfaces belong to, as a setting's InstanceID names them.
+inline constexpr std::string_view hostSystem = "Computer";
+inline constexpr std::string_view serviceProcessorSystem = "BMC";
+
+/// An interface within the machine, as the InstanceID of its setting names it.
+struct InterfaceId {
+    std::string system;
+    std::string name;
+
+    bool operator==(const InterfaceId&) const = default;
+};
+
+/// Reads "Computer%eth0". None when the text is not of that form.
+[[nodiscard]] std::optional<InterfaceId> readInterfaceId(const std::string& text);
 
 /// One network interface at a glance. Empty texts: not known, or there is none.
 struct InterfaceOverview {
-    std::string system;  ///< "Computer", or "BMC" for the service processor
+    std::string system;  ///< hostSystem or serviceProcessorSystem
     std::string name;
     std::optional<bool> dhcp;  ///< none: the provider does not tell
     std::string state;         ///< in words
@@ -43,22 +57,13 @@ struct ServedInstances {
 /// and nothing about DHCP.
 [[nodiscard]] std::vector<InterfaceOverview> interfacesOf(const ZR::Snapshot& snapshot);
 
-/// The interfaces of another machine, of which only that is known which is served:
-/// those that have a setting, in their order, with the addresses of their IP
-/// endpoints. `processors` are the service processors' names. The state of an
-/// interface that does not use DHCP is not known.
+/// The interfaces of another machine, as far as its provider tells: those that have a
+/// setting, in their order, with the addresses of their IP endpoints. `processors` are
+/// the names of its service processors. The state of an interface that does not use
+/// DHCP is not known.
 [[nodiscard]] std::vector<InterfaceOverview> interfacesOf(
     const std::vector<cimom::Instance>& settings, const std::vector<cimom::Instance>& ipEndpoints,
     const std::vector<std::string>& processors);
-
-/// The instances of a class; none when the class is not served. Throws Failure for
-/// any other answer than OK.
-[[nodiscard]] std::optional<std::vector<cimom::Instance>> instancesOf(Client& client,
-                                                                      const char* className);
-
-/// Asks the provider for what it serves. Throws Failure for any other answer than
-/// OK and that the class is not served.
-[[nodiscard]] ServedInstances askProvider(Client& client);
 
 /// Puts what the provider tells beside the interfaces.
 void addServed(const ServedInstances& served, const ClassLookup& classes,

@@ -8,16 +8,16 @@
 
 namespace cimdhcp {
 
-/// What the object manager answered to one request: paths or instances, depending
-/// on the operation. Absent entries were delivered as null by the provider.
-struct Answer {
+/// What an object manager gave back to one request: paths or instances, depending on
+/// the operation. An entry without a value was delivered as null by the provider.
+struct Response {
     std::string operation;  ///< as DSP0200 names it, e.g. "EnumerateInstances"
     cimom::Status status;
-    std::optional<unsigned> returnDoneCalls = 0;  ///< none: a server does not tell
+    std::optional<unsigned> returnDoneCalls = 0;  ///< none: servers do not tell
     std::vector<std::optional<cimom::ObjectPath>> paths;
     std::vector<std::optional<cimom::Instance>> instances;
 
-    bool operator==(const Answer&) const = default;
+    bool operator==(const Response&) const = default;
 };
 
 }  // namespace cimdhcp

@@ -32,8 +32,8 @@ std::string placeAndReason(const std::string& message) {
     return printable(start == std::string::npos ? message : message.substr(start, end - start));
 }
 
-/// The platform goes on with an empty tree when the file is unusable, and tells why
-/// in the log. Here it is told at once: an empty answer would mislead.
+/// With an unusable file the platform goes on with an empty tree, and logs why. A person
+/// would be misled by an empty result: here it is a failure.
 void checkTree(const std::string& file) {
     const auto content = ZR::File::read(file);
     if (!content) {
@@ -50,7 +50,7 @@ void checkTree(const std::string& file) {
     if (!empty && ZR::InstrumentationService::process().current()->nodes().empty()) {
         throw Failure(ExitStatus::notLoaded,
                       file +
-                          ": this JSON is no instrumentation tree (the system log has the "
+                          ": this JSON is not an instrumentation tree (the system log has the "
                           "line and the reason); \"cimdhcp tree\" prints an example");
     }
 }
@@ -61,8 +61,8 @@ void setUpPlatform(const Options& options, std::ostream& err) {
     setVariable("ZR_INSTRUMENTATION_TREE", options.tree);
     setVariable("ZR_DATA_DIR", options.dataDir);
     const ZR::PlatformSettings& settings = ZR::PlatformSettings::process();
-    for (const std::string& complaint : settings.complaints) {
-        err << "cimdhcp: warning: " << printable(complaint) << '\n';
+    for (const std::string& diagnostic : settings.complaints) {
+        err << "cimdhcp: warning: " << printable(diagnostic) << '\n';
     }
     if (!settings.instrumentationTree.empty()) {
         checkTree(settings.instrumentationTree);
@@ -72,7 +72,7 @@ void setUpPlatform(const Options& options, std::ostream& err) {
     std::error_code error;
     if (options.dataDir && std::filesystem::exists(*options.dataDir, error) &&
         !std::filesystem::is_directory(*options.dataDir, error)) {
-        throw Failure(ExitStatus::notLoaded, *options.dataDir + ": is no directory");
+        throw Failure(ExitStatus::notLoaded, *options.dataDir + ": is not a directory");
     }
 }
 

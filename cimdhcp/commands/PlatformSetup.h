@@ -12,7 +12,7 @@ namespace cimdhcp {
 /// in this process.
 ///
 /// Writes a line to `err` for each setting that cannot be used. Throws Failure
-/// when the tree is no file of a JSON tree or the data directory is no directory.
+/// when the tree is not a file of a JSON tree or the data directory is not a directory.
 void setUpPlatform(const Options& options, std::ostream& err);
 
 }  // namespace cimdhcp

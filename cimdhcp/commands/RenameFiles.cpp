@@ -12,6 +12,7 @@
 #include <vector>
 
 #include "text/Failure.h"
+#include "zrcommon/InterfaceFile.h"
 #include "zrcommon/PropertyFile.h"
 #include "zrcommon/UniqueFd.h"
 
@@ -24,6 +25,10 @@ constexpr mode_t fileMode = 0644;
 
 [[noreturn]] void fail(const std::string& what, int error) {
     throw Failure(ExitStatus::notDone, what + ": " + std::strerror(error));
+}
+
+std::string nameLine(const std::string& name) {
+    return std::string(ZR::InterfaceFile::configurationName) + '=' + name + '\n';
 }
 
 /// 0, or the error number.
@@ -43,25 +48,13 @@ int writeAll(int fd, std::string_view content) {
 
 }  // namespace
 
-std::optional<std::string> configurationFilePath(const std::string& dataDir,
-                                                 const std::string& interfaceName) {
-    const bool unusable = std::any_of(interfaceName.begin(), interfaceName.end(), [](char letter) {
-        const auto byte = static_cast<std::uint8_t>(letter);
-        return letter == '/' || byte < 0x20 || byte == 0x7F;
-    });
-    if (unusable || interfaceName.empty() || interfaceName == "." || interfaceName == "..") {
-        return std::nullopt;
-    }
-    return dataDir + "ifcfg-" + interfaceName;
-}
-
 bool canBeConfigurationName(const std::string& name) {
     // Control characters are refused by the object manager, too.
     const bool control = std::any_of(name.begin(), name.end(), [](char letter) {
         const auto byte = static_cast<std::uint8_t>(letter);
         return byte < 0x20 || byte == 0x7F;
     });
-    const std::vector<ZR::PropertyLine> lines = ZR::parsePropertyLines("CONFIG_NAME=" + name);
+    const std::vector<ZR::PropertyLine> lines = ZR::parsePropertyLines(nameLine(name));
     return !control && lines.size() == 1 && lines.front().value == name;
 }
 
@@ -82,7 +75,7 @@ void createConfigurationFile(const std::string& path, const std::string& interfa
     if (!fd) {
         fail("cannot make the file " + path, errno);
     }
-    const std::string content = "DEVICE=" + interfaceName + "\nCONFIG_NAME=" + name + '\n';
+    const std::string content = "DEVICE=" + interfaceName + "\n" + nameLine(name);
     int error = writeAll(fd.get(), content);
     // Readable for all even where the umask is narrower: the file has no secrets,
     // and object managers do not always run as its owner.
@@ -101,7 +94,7 @@ std::string whyUnchanged(const std::string& path) {
         return path + ": " + std::strerror(errno);
     }
     if (!S_ISREG(status.st_mode)) {
-        return path + " is no regular file";
+        return path + " is not a regular file";
     }
     for (const int access : {R_OK, W_OK}) {
         if (::access(path.c_str(), access) != 0) {

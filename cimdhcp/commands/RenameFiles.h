@@ -1,14 +1,8 @@
 #pragma once
 
-#include <optional>
 #include <string>
 
 namespace cimdhcp {
-
-/// The path of an interface's configuration file in the data directory, which ends
-/// with "/". None when the name cannot be part of a file's name.
-[[nodiscard]] std::optional<std::string> configurationFilePath(const std::string& dataDir,
-                                                               const std::string& interfaceName);
 
 /// Whether a name comes back from a configuration file as it was put in: it is one
 /// line without blanks at its ends or quotation marks around it.
@@ -24,7 +18,7 @@ bool createDataDirectory(const std::string& dataDir);
 void createConfigurationFile(const std::string& path, const std::string& interfaceName,
                              const std::string& name);
 
-/// Why a file could not be changed, as far as it can be told from outside.
+/// Why the provider could not change a file, as far as this process can see.
 [[nodiscard]] std::string whyUnchanged(const std::string& path);
 
 }  // namespace cimdhcp

@@ -5,8 +5,9 @@
 #include <utility>
 
 #include "cimom/ObjectPathText.h"
-#include "text/InstanceMeanings.h"
+#include "text/Columns.h"
 #include "text/NaturalOrder.h"
+#include "text/ValueMeaning.h"
 
 namespace cimdhcp {
 
@@ -31,9 +32,9 @@ void sortObjects(std::vector<Object>& objects, const Text& textOf) {
                    [](auto& each) { return std::move(each.second); });
 }
 
-std::vector<std::string> columnsOf(const Answer& answer) {
+std::vector<std::string> columnsOf(const Response& response) {
     std::vector<std::string> columns{pathColumn};
-    for (const auto& instance : answer.instances) {
+    for (const auto& instance : response.instances) {
         for (const cimom::NamedValue& property :
              instance ? instance->properties : std::vector<cimom::NamedValue>()) {
             if (std::find(columns.begin(), columns.end(), property.name) == columns.end()) {
@@ -46,16 +47,16 @@ std::vector<std::string> columnsOf(const Answer& answer) {
 
 }  // namespace
 
-void sortAnswer(const std::string& wanted, Answer& answer) {
-    if (answer.paths.empty() && answer.instances.empty()) {
+void sortResponse(const std::string& wanted, Response& response) {
+    if (response.paths.empty() && response.instances.empty()) {
         return;
     }
-    const std::vector<std::string> columns = columnsOf(answer);
+    const std::vector<std::string> columns = columnsOf(response);
     const std::string& column = columns[columnNamed(wanted, columns)];
-    sortObjects(answer.paths, [](const cimom::ObjectPath& path) {
+    sortObjects(response.paths, [](const cimom::ObjectPath& path) {
         return std::optional<std::string>(cimom::toText(path));
     });
-    sortObjects(answer.instances, [&column](const cimom::Instance& instance) {
+    sortObjects(response.instances, [&column](const cimom::Instance& instance) {
         if (column == pathColumn) {
             return std::optional<std::string>(cimom::toText(instance.path));
         }

@@ -6,8 +6,9 @@
 
 namespace cimdhcp {
 
-/// Sorts what was answered by PATH or, instances, by one of their properties; what
-/// lacks it comes last. Throws Failure when nothing has it.
-void sortAnswer(const std::string& wanted, Answer& answer);
+/// Sorts the paths of a response by their text, or its instances by PATH or one of their
+/// properties; instances without the property come last. Throws Failure when no instance
+/// has it.
+void sortResponse(const std::string& wanted, Response& response);
 
 }  // namespace cimdhcp

@@ -12,11 +12,10 @@ enum class ExitStatus : int {
     usage = 2,          ///< the command line cannot be understood
     notLoaded = 3,      ///< the provider or a file cannot be loaded, or the output not written
     notAllDone = 4,     ///< some of several servers have failed
-    interrupted = 130,  ///< as shells call the end by SIGINT
+    interrupted = 130,  ///< as shells report the end by SIGINT
 };
 
-/// Ends the command. what() is one line for the person at the keyboard, with a
-/// remedy where there is one.
+/// Ends the command. what() is one line for the user, with a remedy where there is one.
 class Failure : public std::runtime_error {
   public:
     Failure(ExitStatus status, const std::string& message)

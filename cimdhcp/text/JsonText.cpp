@@ -7,16 +7,11 @@
 #include <variant>
 
 #include "cimom/ObjectPathText.h"
-#include "client/StatusMessage.h"
 #include "zrcommon/Strings.h"
 
 namespace cimdhcp {
 
 namespace {
-
-using Json = nlohmann::ordered_json;
-
-Json instanceJson(const cimom::Instance& instance);
 
 Json realJson(double number) {
     if (std::isfinite(number)) {
@@ -49,7 +44,7 @@ Json scalarJson(const cimom::Scalar& scalar) {
 
 Json valueJson(const cimom::Value& value) {
     if (const cimom::Array* const elements = value.array()) {
-        Json list = Json::array();
+        JsonList list;
         for (const cimom::Scalar& element : *elements) {
             list.push_back(scalarJson(element));
         }
@@ -59,40 +54,63 @@ Json valueJson(const cimom::Value& value) {
     return scalar == nullptr ? Json(nullptr) : scalarJson(*scalar);
 }
 
-Json instanceJson(const cimom::Instance& instance) {
-    Json properties = Json::object();
-    for (const cimom::NamedValue& property : instance.properties) {
-        properties[property.name] = Json{{"type", cimom::typeName(property.value.type)},
-                                         {"value", valueJson(property.value)}};
-    }
-    return Json{{"path", cimom::toText(instance.path)},
-                {"class", instance.path.className},
-                {"properties", std::move(properties)}};
+nlohmann::ordered_json writable(const Json& value) {
+    return std::visit(
+        [](const auto& held) -> nlohmann::ordered_json {
+            using Held = std::decay_t<decltype(held)>;
+            if constexpr (std::is_same_v<Held, JsonList>) {
+                auto list = nlohmann::ordered_json::array();
+                for (const Json& element : held) {
+                    list.push_back(writable(element));
+                }
+                return list;
+            } else if constexpr (std::is_same_v<Held, JsonMembers>) {
+                auto object = nlohmann::ordered_json::object();
+                for (const auto& [name, member] : held) {
+                    object[name] = writable(member);
+                }
+                return object;
+            } else if constexpr (std::is_same_v<Held, JsonDocument>) {
+                return nlohmann::ordered_json::parse(held.text);
+            } else {
+                return held;
+            }
+        },
+        value);
+}
+
+std::string written(const Json& value, int indentation) {
+    return writable(value).dump(indentation, ' ', false,
+                                nlohmann::ordered_json::error_handler_t::replace) +
+           '\n';
 }
 
 }  // namespace
 
-std::string asJson(const Answer& answer) {
-    Json paths = Json::array();
-    for (const auto& path : answer.paths) {
-        paths.push_back(path ? Json(cimom::toText(*path)) : Json(nullptr));
-    }
-    Json instances = Json::array();
-    for (const auto& instance : answer.instances) {
-        instances.push_back(instance ? instanceJson(*instance) : Json(nullptr));
-    }
-    return jsonText(Json{
-        {"operation", answer.operation},
-        {"status",
-         {{"code", static_cast<int>(answer.status.code)}, {"name", statusNameOf(answer.status)}}},
-        {"returnDone", answer.returnDoneCalls ? Json(*answer.returnDoneCalls) : Json(nullptr)},
-        {"paths", std::move(paths)},
-        {"instances", std::move(instances)}});
+Json textOrNull(const std::string& text) {
+    return text.empty() ? Json(nullptr) : Json(text);
 }
 
-std::string jsonText(const nlohmann::ordered_json& document) {
+Json instanceJson(const cimom::Instance& instance) {
+    JsonMembers properties;
+    for (const cimom::NamedValue& property : instance.properties) {
+        properties.emplace_back(
+            property.name, JsonMembers{{"type", std::string(cimom::typeName(property.value.type))},
+                                       {"value", valueJson(property.value)}});
+    }
+    return JsonMembers{{"path", cimom::toText(instance.path)},
+                       {"class", instance.path.className},
+                       {"properties", std::move(properties)}};
+}
+
+std::string jsonText(const Json& value) {
     constexpr int indentation = 2;
-    return document.dump(indentation, ' ', false, Json::error_handler_t::replace) + '\n';
+    return written(value, indentation);
+}
+
+std::string jsonLine(const Json& value) {
+    constexpr int none = -1;
+    return written(value, none);
 }
 
 }  // namespace cimdhcp

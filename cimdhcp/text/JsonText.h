@@ -1,22 +1,43 @@
 #pragma once
 
-#include <nlohmann/json_fwd.hpp>
+#include <cstddef>
+#include <cstdint>
 #include <string>
+#include <utility>
+#include <variant>
+#include <vector>
 
-#include "client/Response.h"
+#include "cimom/Cim.h"
 
 namespace cimdhcp {
 
-/// The answer as one JSON object with a line feed at its end:
-/// {"operation", "status": {"code", "name"}, "returnDone", "paths": [TEXT...],
-/// "instances": [{"path", "class", "properties": {NAME: {"type", "value"}}}]}.
-/// What is null stays null; "returnDone" is null in a server's answer. References are path texts,
-/// embedded instances objects as in "instances", reals that are no number texts ("NaN", "INF",
-/// "-INF").
-[[nodiscard]] std::string asJson(const Answer& answer);
+struct Json;
+using JsonList = std::vector<Json>;
+using JsonMembers = std::vector<std::pair<std::string, Json>>;  ///< of an object, in this order
+/// The text of a whole document, which becomes a part of another one.
+struct JsonDocument {
+    std::string text;
+};
 
-/// Writes any document in the same way: indented by two blanks, with a line feed
-/// at its end; bytes that are no UTF-8 become U+FFFD.
-[[nodiscard]] std::string jsonText(const nlohmann::ordered_json& document);
+/// A JSON value that is to be written. The library that writes it is slow to compile,
+/// and so known to one source file alone.
+struct Json : std::variant<std::nullptr_t, bool, std::int64_t, std::uint64_t, double, std::string,
+                           JsonList, JsonMembers, JsonDocument> {
+    using variant::variant;
+};
+
+/// The text, or null for an empty one.
+[[nodiscard]] Json textOrNull(const std::string& text);
+
+/// {"path", "class", "properties": {NAME: {"type", "value"}}}. What is null stays
+/// null. References are path texts, embedded instances objects of this form, and reals
+/// that are not numbers the texts "NaN", "INF" and "-INF".
+[[nodiscard]] Json instanceJson(const cimom::Instance& instance);
+
+/// The value, indented by two blanks, with a line feed at its end; bytes that are not
+/// UTF-8 become U+FFFD.
+[[nodiscard]] std::string jsonText(const Json& value);
+/// The same on one line.
+[[nodiscard]] std::string jsonLine(const Json& value);
 
 }  // namespace cimdhcp

@@ -9,7 +9,6 @@
 #include <variant>
 
 #include "cimom/ObjectPathText.h"
-#include "text/MofFormat.h"
 #include "zrcommon/Strings.h"
 
 namespace cimdhcp {
@@ -112,6 +111,14 @@ std::string mofInitializer(const cimom::Value& value) {
     }
     const cimom::Scalar* const scalar = value.scalar();
     return scalar == nullptr ? "NULL" : mofLiteral(*scalar);
+}
+
+std::string mofDeclaration(const cimom::Instance& instance) {
+    std::string text = "instance of " + instance.path.className + " {";
+    for (const cimom::NamedValue& property : instance.properties) {
+        text += ' ' + property.name + " = " + mofInitializer(property.value) + ';';
+    }
+    return text + " };";
 }
 
 }  // namespace cimdhcp

@@ -12,11 +12,13 @@ namespace cimdhcp {
 [[nodiscard]] std::string mofString(std::string_view text);
 
 /// A value as a MOF initializer: NULL, a literal, or {literal, ...}. A reference
-/// is its path as a string. An embedded instance, too, is a string: that of its
-/// own declaration.
+/// is its path as a string. An embedded instance is the string of its declaration.
 [[nodiscard]] std::string mofInitializer(const cimom::Value& value);
 
 /// One element of a value as a MOF literal.
 [[nodiscard]] std::string mofLiteral(const cimom::Scalar& scalar);
+
+/// The declaration of an instance on one line.
+[[nodiscard]] std::string mofDeclaration(const cimom::Instance& instance);
 
 }  // namespace cimdhcp

@@ -2,10 +2,6 @@
 
 #include <algorithm>
 
-#include "cimom/Cim.h"
-#include "text/DisplayText.h"
-#include "text/Failure.h"
-
 namespace cimdhcp {
 
 namespace {
@@ -22,12 +18,6 @@ std::string_view takeNumber(std::string_view& text) noexcept {
     text.remove_prefix(number.size());
     number.remove_prefix(std::min(number.find_first_not_of('0'), number.size()));
     return number;
-}
-
-std::string plain(std::string name) {
-    std::replace_if(
-        name.begin(), name.end(), [](char c) { return c == '-' || c == '_'; }, ' ');
-    return name;
 }
 
 }  // namespace
@@ -52,20 +42,8 @@ bool comesBefore(std::string_view a, std::string_view b) noexcept {
             b.remove_prefix(1);
         }
     }
-    // What is the same but for leading zeros still has an order.
+    // Texts that differ in leading zeros alone still have an order.
     return a.empty() && b.empty() ? wholeA < wholeB : a.empty();
-}
-
-std::size_t columnNamed(const std::string& wanted, const std::vector<std::string>& names) {
-    std::string known;
-    for (std::size_t index = 0; index < names.size(); ++index) {
-        if (cimom::sameName(plain(names[index]), plain(wanted))) {
-            return index;
-        }
-        known += (index == 0 ? "" : ", ") + printable(names[index]);
-    }
-    throw Failure(ExitStatus::usage,
-                  "--sort: there is no column \"" + printable(wanted) + "\"; there are: " + known);
 }
 
 }  // namespace cimdhcp

@@ -26,18 +26,6 @@ std::string refusal(Find&& find) {
     }
 }
 
-class DirectoriesFound : public ::testing::Test {
-  protected:
-    Directories makeInstallation(const std::string& name) const {
-        const fs::path schema = root_.path() / name / "schema";
-        fs::create_directories(schema);
-        writeFile(schema / "a.mof", "");
-        return {schema, schema, {root_.path() / name / "lib"}};
-    }
-
-    TemporaryDirectory root_;
-};
-
 TEST(Installations, BeginWithTheOneOfTheExecutable) {
     const auto places = installations("/opt/dhcp/bin/cimdhcp");
     ASSERT_EQ(places.size(), 2U);
@@ -46,43 +34,6 @@ TEST(Installations, BeginWithTheOneOfTheExecutable) {
     EXPECT_EQ(places[0].providers.back(), "/opt/dhcp/lib/cmpi");
     EXPECT_TRUE(places[1].schema.is_absolute());
     EXPECT_EQ(places[1].registrations, places[1].schema);
-}
-
-TEST_F(DirectoriesFound, AreThoseOfTheFirstInstallationWithASchema) {
-    const Directories empty{root_.path() / "none", root_.path() / "none", {"/none"}};
-    const Directories first = makeInstallation("first");
-    const Directories second = makeInstallation("second");
-    EXPECT_EQ(findDirectories({}, {empty, first, second}), first);
-}
-
-TEST_F(DirectoriesFound, MoveWithTheOptions) {
-    const Directories place = makeInstallation("place");
-    const std::string other = makeInstallation("other").schema;
-    Options options;
-    options.schemaDir = other;
-    EXPECT_EQ(findDirectories(options, {place}), (Directories{other, other, place.providers}));
-    options.registrationDir = place.schema;
-    EXPECT_EQ(findDirectories(options, {place}),
-              (Directories{other, place.schema, place.providers}));
-    options.providerDir = other;
-    EXPECT_EQ(findDirectories(options, {}), (Directories{other, place.schema, {other}}));
-}
-
-TEST_F(DirectoriesFound, NameThePlacesWhereTheyWereNot) {
-    EXPECT_EQ(
-        refusal([] {
-            return findDirectories({}, {{"/a/b", "", {}}, {"/c", "", {}}});
-        }),
-        "no schema found in /a/b, /c; --schema-dir and --provider-dir can name where they are");
-}
-
-TEST_F(DirectoriesFound, MustExistWhenNamed) {
-    const Directories place = makeInstallation("place");
-    Options options;
-    options.providerDir = root_ / "missing";
-    EXPECT_EQ(
-        refusal([&] { return findDirectories(options, {place}); }),
-        root_ / "missing" + ": no such directory (from --provider-dir or CIMDHCP_PROVIDER_DIR)");
 }
 
 TEST(RegistrationFiles, AreSortedByName) {

@@ -61,6 +61,11 @@ cimom::Instance ipEndpoint(const std::string& system, const std::string& name,
     return instance;
 }
 
+TEST(InterfaceIdText, IsSplitAtTheFirstSign) {
+    EXPECT_EQ(readInterfaceId("Computer%eth%1"), (InterfaceId{"Computer", "eth%1"}));
+    EXPECT_EQ(readInterfaceId("eth0"), std::nullopt);
+}
+
 TEST(InterfacesOfAnotherMachine, AreThoseThatHaveASetting) {
     EXPECT_EQ(interfacesOf({setting("Computer%eth0", "office"), setting("Computer%eth%1", ""),
                             setting("BMC%eth0", ""), setting("nothing", "")},
@@ -74,9 +79,9 @@ TEST(InterfacesOfAnotherMachine, AreThoseThatHaveASetting) {
                   {"BMC", "eth0", std::nullopt, "", "192.0.2.18", {}, ""}}));
 }
 
-class MachineOverview : public ::testing::Test {
+class MachineInterfacesServed : public ::testing::Test {
   protected:
-    MachineOverview() { repository_.loadText(schema, "small.mof"); }
+    MachineInterfacesServed() { repository_.loadText(schema, "small.mof"); }
 
     std::vector<InterfaceOverview> with(const ServedInstances& served) const {
         auto interfaces = interfaces_;
@@ -116,11 +121,11 @@ TEST(InterfacesOfATree, AreThoseOfItsNetworks) {
                   {"Computer", "", std::nullopt, "", "", {}, ""}}));
 }
 
-TEST_F(MachineOverview, StaysAsItIsWhenNothingIsServed) {
+TEST_F(MachineInterfacesServed, StaysAsItIsWhenNothingIsServed) {
     EXPECT_EQ(with({}), interfaces_);
 }
 
-TEST_F(MachineOverview, HasDhcpOffWithoutAnEndpoint) {
+TEST_F(MachineInterfacesServed, HasDhcpOffWithoutAnEndpoint) {
     ServedInstances served;
     served.endpoints.emplace();
     for (const InterfaceOverview& each : with(served)) {
@@ -129,7 +134,7 @@ TEST_F(MachineOverview, HasDhcpOffWithoutAnEndpoint) {
     EXPECT_EQ(with(served)[0].state, "active");
 }
 
-TEST_F(MachineOverview, TakesTheStateOfTheClient) {
+TEST_F(MachineInterfacesServed, TakesTheStateOfTheClient) {
     ServedInstances served;
     served.endpoints = {endpoint(host, "eth0", 2, 8), endpoint(host, "eth0_1", 3, 0),
                         endpoint(processor, "eth0", 2, 99)};
@@ -140,7 +145,7 @@ TEST_F(MachineOverview, TakesTheStateOfTheClient) {
     EXPECT_EQ(interfaces[2].state, "99");
 }
 
-TEST_F(MachineOverview, TellsInterfacesOfOneNameApartByTheirSystem) {
+TEST_F(MachineInterfacesServed, TellsInterfacesOfOneNameApartByTheirSystem) {
     ServedInstances served;
     served.endpoints = {endpoint(processor, "eth0", 2, 8)};
     served.accessPoints = {accessPoint(processor, "eth0_IPv4", "192.0.2.1")};
@@ -152,7 +157,7 @@ TEST_F(MachineOverview, TellsInterfacesOfOneNameApartByTheirSystem) {
               (InterfaceOverview{"BMC", "eth0", true, "bound", "", {"192.0.2.1"}, "management"}));
 }
 
-TEST_F(MachineOverview, FindsServersByTheWholeNameOfTheInterface) {
+TEST_F(MachineInterfacesServed, FindsServersByTheWholeNameOfTheInterface) {
     ServedInstances served;
     served.accessPoints = {accessPoint(host, "eth0_IPv4", "192.0.2.1"),
                            accessPoint(host, "eth0_IPv6", "2001:db8::1"),

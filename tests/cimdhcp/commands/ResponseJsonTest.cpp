@@ -1,4 +1,4 @@
-#include "text/JsonText.h"
+#include "commands/ResponseText.h"
 
 #include <gtest/gtest.h>
 
@@ -17,7 +17,7 @@ using cimom::Type;
 using cimom::Value;
 using Json = nlohmann::json;
 
-/// One value in its place in the answer.
+/// One value in its place in the response.
 Json valueIn(const Value& value) {
     cimom::Instance instance;
     instance.path.className = "TEST_Thing";
@@ -26,10 +26,10 @@ Json valueIn(const Value& value) {
     return document["instances"][0]["properties"]["P"];
 }
 
-TEST(JsonFormat, HasAllPartsInTheirOrder) {
-    Answer answer{"EnumerateInstanceNames", {}, 1, {}, {}};
-    answer.paths = {cimom::parseObjectPath("root/cimv2:TEST_Base.Id=\"a\""), std::nullopt};
-    EXPECT_EQ(asJson(answer), R"({
+TEST(ResponseJson, HasAllPartsInTheirOrder) {
+    Response response{"EnumerateInstanceNames", {}, 1, {}, {}};
+    response.paths = {cimom::parseObjectPath("root/cimv2:TEST_Base.Id=\"a\""), std::nullopt};
+    EXPECT_EQ(asJson(response), R"({
   "operation": "EnumerateInstanceNames",
   "status": {
     "code": 0,
@@ -45,12 +45,12 @@ TEST(JsonFormat, HasAllPartsInTheirOrder) {
 )");
 }
 
-TEST(JsonFormat, AServerDoesNotTellAboutItsProvider) {
+TEST(ResponseJson, AServerDoesNotTellAboutItsProvider) {
     EXPECT_NE(asJson({"GetInstance", {}, std::nullopt, {}, {}}).find("\"returnDone\": null"),
               std::string::npos);
 }
 
-TEST(JsonFormat, HasInstancesWithTheirProperties) {
+TEST(ResponseJson, HasInstancesWithTheirProperties) {
     cimom::Instance instance;
     instance.path = cimom::parseObjectPath("root/cimv2:TEST_Base.Id=\"a\"");
     instance.properties = {{"Id", Value::ofString("a")},
@@ -92,13 +92,13 @@ TEST(JsonFormat, HasInstancesWithTheirProperties) {
 )");
 }
 
-TEST(JsonFormat, NamesTheStatus) {
-    const Answer answer{"GetInstance", {CMPI_RC_ERR_NOT_FOUND, "words"}, 0, {}, {}};
-    EXPECT_EQ(Json::parse(asJson(answer))["status"],
+TEST(ResponseJson, NamesTheStatus) {
+    const Response response{"GetInstance", {CMPI_RC_ERR_NOT_FOUND, "words"}, 0, {}, {}};
+    EXPECT_EQ(Json::parse(asJson(response))["status"],
               Json({{"code", 6}, {"name", "CIM_ERR_NOT_FOUND"}}));
 }
 
-TEST(JsonFormat, KeepsNumbersExactly) {
+TEST(ResponseJson, KeepsNumbersExactly) {
     EXPECT_EQ(
         valueIn({Type::uint64, false, Scalar(std::numeric_limits<std::uint64_t>::max())}).dump(),
         R"({"type":"uint64","value":18446744073709551615})");
@@ -107,7 +107,7 @@ TEST(JsonFormat, KeepsNumbersExactly) {
         R"({"type":"sint64","value":-9223372036854775808})");
 }
 
-TEST(JsonFormat, WritesTheOtherTypes) {
+TEST(ResponseJson, WritesTheOtherTypes) {
     EXPECT_EQ(valueIn({Type::boolean, false, Scalar(true)})["value"], true);
     EXPECT_EQ(valueIn({Type::char16, false, Scalar(u'ü')})["value"], "ü");
     EXPECT_EQ(valueIn({Type::real64, false, Scalar(1.5)})["value"], 1.5);
@@ -126,7 +126,7 @@ TEST(JsonFormat, WritesTheOtherTypes) {
               Json({{"type", "reference"}, {"value", "a:TEST_Base.Id=\"x\""}}));
 }
 
-TEST(JsonFormat, NestsEmbeddedInstances) {
+TEST(ResponseJson, NestsEmbeddedInstances) {
     cimom::Instance inner;
     inner.path.className = "TEST_Keyless";
     inner.properties.push_back({"Text", Value::ofString("x")});
@@ -136,7 +136,7 @@ TEST(JsonFormat, NestsEmbeddedInstances) {
     EXPECT_EQ(json["value"]["properties"]["Text"]["value"], "x");
 }
 
-TEST(JsonFormat, IsJsonWhateverTheBytes) {
+TEST(ResponseJson, IsJsonWhateverTheBytes) {
     EXPECT_EQ(valueIn(Value::ofString("a\xFF"))["value"], "a\xEF\xBF\xBD");
 }
 

@@ -1,4 +1,4 @@
-#include "text/MofFormat.h"
+#include "commands/ResponseText.h"
 
 #include <gtest/gtest.h>
 
@@ -13,12 +13,12 @@ using cimom::Scalar;
 using cimom::Type;
 using cimom::Value;
 
-class MofFormat : public ::testing::Test {
+class ResponseMof : public ::testing::Test {
   protected:
     const cimom::ClassRepository repository_ = test::smallRepository();
 };
 
-TEST_F(MofFormat, DeclaresInstancesWithMeanings) {
+TEST_F(ResponseMof, DeclaresInstancesWithMeanings) {
     cimom::Instance instance;
     instance.path.className = "TEST_Thing";
     instance.properties = {
@@ -37,10 +37,10 @@ TEST_F(MofFormat, DeclaresInstancesWithMeanings) {
               "// The provider delivered a null instance.\n");
 }
 
-TEST_F(MofFormat, DeclaresTheKeysOfPaths) {
-    Answer answer{"EnumerateInstanceNames", {}, 0, {}, {}};
-    answer.paths = {cimom::parseObjectPath("root/cimv2:TEST_Base.Id=\"a\""), std::nullopt};
-    EXPECT_EQ(asMof(answer, repository_),
+TEST_F(ResponseMof, DeclaresTheKeysOfPaths) {
+    Response response{"EnumerateInstanceNames", {}, 0, {}, {}};
+    response.paths = {cimom::parseObjectPath("root/cimv2:TEST_Base.Id=\"a\""), std::nullopt};
+    EXPECT_EQ(asMof(response, repository_),
               "instance of TEST_Base {\n"
               "    Id = \"a\";\n"
               "};\n"
@@ -48,7 +48,7 @@ TEST_F(MofFormat, DeclaresTheKeysOfPaths) {
               "// The provider delivered a null path.\n");
 }
 
-TEST_F(MofFormat, KeepsAnUnknownClass) {
+TEST_F(ResponseMof, KeepsAnUnknownClass) {
     cimom::Instance instance;
     instance.path.className = "TEST_Unknown";
     instance.properties = {{"State", {Type::sint32, false, Scalar(std::int64_t{2})}}};
@@ -56,7 +56,7 @@ TEST_F(MofFormat, KeepsAnUnknownClass) {
               "instance of TEST_Unknown {\n    State = 2;\n};\n");
 }
 
-TEST_F(MofFormat, LetsNoMeaningEndItsComment) {
+TEST_F(ResponseMof, LetsNoMeaningEndItsComment) {
     cimom::ClassRepository repository;
     repository.loadText(
         "Qualifier Values : string[], Scope(property), Flavor(EnableOverride, ToSubclass);\n"
@@ -69,7 +69,7 @@ TEST_F(MofFormat, LetsNoMeaningEndItsComment) {
               "instance of TEST_Odd {\n    P = 0;  // a\\x0Ab\n};\n");
 }
 
-TEST_F(MofFormat, IsEmptyForAnEmptyAnswer) {
+TEST_F(ResponseMof, IsEmptyForAnEmptyResponse) {
     EXPECT_EQ(asMof({"ModifyInstance", {}, 1, {}, {}}, repository_), "");
 }
 

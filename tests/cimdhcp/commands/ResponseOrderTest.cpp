@@ -22,44 +22,44 @@ cimom::Instance instance(const std::string& id, std::optional<std::uint64_t> siz
     return made;
 }
 
-std::string order(const Answer& answer) {
+std::string order(const Response& response) {
     std::string text;
-    for (const auto& each : answer.instances) {
+    for (const auto& each : response.instances) {
         const cimom::Value* const id = each ? each->property("Id") : nullptr;
         text += id == nullptr ? "- " : std::get<std::string>(*id->scalar()) + ' ';
     }
     return text;
 }
 
-TEST(AnswerOrder, PathsAreSortedByTheirText) {
-    Answer answer;
-    answer.paths = {path("eth10"), std::nullopt, path("eth2")};
-    sortAnswer("path", answer);
-    EXPECT_THAT(answer.paths, testing::ElementsAre(path("eth2"), path("eth10"), std::nullopt));
+TEST(ResponseOrder, PathsAreSortedByTheirText) {
+    Response response;
+    response.paths = {path("eth10"), std::nullopt, path("eth2")};
+    sortResponse("path", response);
+    EXPECT_THAT(response.paths, testing::ElementsAre(path("eth2"), path("eth10"), std::nullopt));
 }
 
-TEST(AnswerOrder, InstancesAreSortedByAPropertyAndThoseWithoutItComeLast) {
-    Answer answer;
-    answer.instances = {instance("c", 10), instance("d", std::nullopt), std::nullopt,
-                        instance("a", 9), instance("b", 10)};
-    sortAnswer("size", answer);
-    EXPECT_EQ(order(answer), "a c b d - ");
-    sortAnswer("PATH", answer);
-    EXPECT_EQ(order(answer), "a b c d - ");
+TEST(ResponseOrder, InstancesAreSortedByAPropertyAndThoseWithoutItComeLast) {
+    Response response;
+    response.instances = {instance("c", 10), instance("d", std::nullopt), std::nullopt,
+                          instance("a", 9), instance("b", 10)};
+    sortResponse("size", response);
+    EXPECT_EQ(order(response), "a c b d - ");
+    sortResponse("PATH", response);
+    EXPECT_EQ(order(response), "a b c d - ");
 }
 
-TEST(AnswerOrder, WhatNothingHasIsAMistake) {
-    Answer answer;
-    answer.instances = {instance("a", 1)};
+TEST(ResponseOrder, WhatNothingHasIsAMistake) {
+    Response response;
+    response.instances = {instance("a", 1)};
     try {
-        sortAnswer("Color", answer);
+        sortResponse("Color", response);
         ADD_FAILURE() << "accepted";
     } catch (const Failure& failure) {
         EXPECT_STREQ(failure.what(),
                      "--sort: there is no column \"Color\"; there are: PATH, Id, Size");
     }
-    Answer nothing;
-    sortAnswer("Color", nothing);
+    Response nothing;
+    sortResponse("Color", nothing);
 }
 
 }  // namespace

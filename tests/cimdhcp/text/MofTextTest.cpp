@@ -15,12 +15,12 @@ using cimom::Scalar;
 using cimom::Type;
 using cimom::Value;
 
-TEST(ValueText, EscapesTexts) {
+TEST(MofText, EscapesTexts) {
     EXPECT_EQ(mofString("plain 'x' büro"), R"("plain 'x' büro")");
     EXPECT_EQ(mofString("a\"b\\c\b\t\n\f\r"), R"("a\"b\\c\b\t\n\f\r")");
 }
 
-TEST(ValueText, WritesOtherControlCharactersWithFourDigits) {
+TEST(MofText, WritesOtherControlCharactersWithFourDigits) {
     // A shorter escape would swallow the digit behind it.
     EXPECT_EQ(mofString(std::string("\x1B\x7F\0"
                                     "1",
@@ -28,7 +28,7 @@ TEST(ValueText, WritesOtherControlCharactersWithFourDigits) {
               R"("\x001B\x007F\x00001")");
 }
 
-TEST(ValueText, WritesEachKindOfScalar) {
+TEST(MofText, WritesEachKindOfScalar) {
     EXPECT_EQ(mofLiteral(Scalar()), "NULL");
     EXPECT_EQ(mofLiteral(Scalar(true)), "TRUE");
     EXPECT_EQ(mofLiteral(Scalar(false)), "FALSE");
@@ -40,20 +40,20 @@ TEST(ValueText, WritesEachKindOfScalar) {
     EXPECT_EQ(mofLiteral(Scalar(std::string("x"))), "\"x\"");
 }
 
-TEST(ValueText, WritesRealsWithAPoint) {
+TEST(MofText, WritesRealsWithAPoint) {
     EXPECT_EQ(mofLiteral(Scalar(1.5)), "1.5");
     EXPECT_EQ(mofLiteral(Scalar(2.0)), "2.0");
     EXPECT_EQ(mofLiteral(Scalar(1e300)), "1.0e+300");
     EXPECT_EQ(mofLiteral(Scalar(std::numeric_limits<double>::infinity())), "NULL");
 }
 
-TEST(ValueText, WritesReferencesAsTheTextOfTheirPath) {
+TEST(MofText, WritesReferencesAsTheTextOfTheirPath) {
     const auto path = std::make_shared<const cimom::ObjectPath>(
         cimom::parseObjectPath("root/cimv2:TEST_Base.Id=\"a\""));
     EXPECT_EQ(mofLiteral(Scalar(path)), R"("root/cimv2:TEST_Base.Id=\"a\"")");
 }
 
-TEST(ValueText, WritesEmbeddedInstancesAsTheTextOfTheirDeclaration) {
+TEST(MofText, WritesEmbeddedInstancesAsTheTextOfTheirDeclaration) {
     cimom::Instance inner;
     inner.path.className = "TEST_Keyless";
     inner.properties.push_back({"Text", Value::ofString("x")});
@@ -61,7 +61,7 @@ TEST(ValueText, WritesEmbeddedInstancesAsTheTextOfTheirDeclaration) {
               R"("instance of TEST_Keyless { Text = \"x\"; };")");
 }
 
-TEST(ValueText, WritesInitializers) {
+TEST(MofText, WritesInitializers) {
     EXPECT_EQ(mofInitializer(Value::null(Type::uint16, false)), "NULL");
     EXPECT_EQ(mofInitializer(Value::null(Type::uint16, true)), "NULL");
     EXPECT_EQ(mofInitializer({Type::uint16, false, Scalar(std::uint64_t{2})}), "2");

@@ -5,12 +5,10 @@
 
 #include <algorithm>
 
-#include "text/Failure.h"
-
 namespace cimdhcp {
 namespace {
 
-TEST(SortOrder, NumbersCountByTheirValue) {
+TEST(NaturalOrder, NumbersCountByTheirValue) {
     std::vector<std::string> texts{"eth10", "eth2",       "eth",       "Eth3", "eth02", "eth2.5",
                                    "10",    "192.0.2.17", "192.0.2.9", "9",    "",      "eth2"};
     std::sort(texts.begin(), texts.end(), comesBefore);
@@ -18,7 +16,7 @@ TEST(SortOrder, NumbersCountByTheirValue) {
                                             "eth02", "eth2", "eth2", "eth2.5", "eth10"));
 }
 
-TEST(SortOrder, IsOneForAnyTexts) {
+TEST(NaturalOrder, IsOneForAnyTexts) {
     const std::vector<std::string> texts{"a",  "a0",  "a00", "0a",   "00a",
                                          "a1", "a01", "a1b", "\xFF", "99999999999999999999999"};
     for (const std::string& a : texts) {
@@ -32,24 +30,6 @@ TEST(SortOrder, IsOneForAnyTexts) {
                     << a << ' ' << b << ' ' << c;
             }
         }
-    }
-}
-
-TEST(ColumnName, MayBeWrittenAsOptionsAre) {
-    const std::vector<std::string> names{"STATE", "CONFIGURATION NAME"};
-    EXPECT_EQ(columnNamed("state", names), 0U);
-    EXPECT_EQ(columnNamed("configuration-name", names), 1U);
-    EXPECT_EQ(columnNamed("Configuration_Name", names), 1U);
-}
-
-TEST(ColumnName, IsToldWhatThereIsWhenItIsWrong) {
-    try {
-        static_cast<void>(columnNamed("size", {"STATE", "ADDRESS"}));
-        ADD_FAILURE() << "accepted";
-    } catch (const Failure& failure) {
-        EXPECT_EQ(failure.status(), ExitStatus::usage);
-        EXPECT_STREQ(failure.what(),
-                     "--sort: there is no column \"size\"; there are: STATE, ADDRESS");
     }
 }
 

@@ -13,7 +13,7 @@ using cimom::Scalar;
 using cimom::Type;
 using cimom::Value;
 
-class TableFormat : public ::testing::Test {
+class ResponseTable : public ::testing::Test {
   protected:
     static cimom::Instance thing(const std::string& id) {
         cimom::Instance instance;
@@ -29,7 +29,7 @@ class TableFormat : public ::testing::Test {
     const cimom::ClassRepository repository_ = test::smallRepository();
 };
 
-TEST_F(TableFormat, HasABlockPerInstanceAndLeavesNullOut) {
+TEST_F(ResponseTable, HasABlockPerInstanceAndLeavesNullOut) {
     EXPECT_EQ(asTable({"EnumerateInstances", {}, 0, {}, {thing("a"), thing("b"), std::nullopt}},
                       repository_, std::nullopt),
               "root/cimv2:TEST_Thing.Id=\"a\"\n"
@@ -45,7 +45,7 @@ TEST_F(TableFormat, HasABlockPerInstanceAndLeavesNullOut) {
               "(null)\n");
 }
 
-TEST_F(TableFormat, GoesOnInFurtherLinesOnATerminal) {
+TEST_F(ResponseTable, GoesOnInFurtherLinesOnATerminal) {
     EXPECT_EQ(asTable({"GetInstance", {}, 0, {}, {thing("a")}}, repository_, 33),
               "root/cimv2:TEST_Thing.Id=\"a\"\n"
               "  Id      = \"a\"\n"
@@ -54,22 +54,22 @@ TEST_F(TableFormat, GoesOnInFurtherLinesOnATerminal) {
               "            (Fourteen)}\n");
 }
 
-TEST_F(TableFormat, LeavesTheLinesToATerminalThatIsTooNarrow) {
+TEST_F(ResponseTable, LeavesTheLinesToATerminalThatIsTooNarrow) {
     EXPECT_EQ(asTable({"GetInstance", {}, 0, {}, {thing("a")}}, repository_, 20),
               asTable({"GetInstance", {}, 0, {}, {thing("a")}}, repository_, std::nullopt));
 }
 
-TEST_F(TableFormat, HasALinePerPathHoweverLong) {
-    Answer answer{"EnumerateInstanceNames", {}, 0, {}, {}};
+TEST_F(ResponseTable, HasALinePerPathHoweverLong) {
+    Response response{"EnumerateInstanceNames", {}, 0, {}, {}};
     const std::string text = "root/cimv2:TEST_Base.Id=\"" + std::string(100, 'x') + "\"";
-    answer.paths = {cimom::parseObjectPath(text), std::nullopt};
-    EXPECT_EQ(asTable(answer, repository_, 40), text + "\n(null)\n");
+    response.paths = {cimom::parseObjectPath(text), std::nullopt};
+    EXPECT_EQ(asTable(response, repository_, 40), text + "\n(null)\n");
 }
 
-TEST_F(TableFormat, LetsNothingSteerTheTerminal) {
-    Answer answer{"EnumerateInstanceNames", {}, 0, {}, {}};
-    answer.paths = {cimom::parseObjectPath("root/cimv2:TEST_Base.Id=\"\x1B[2J\"")};
-    EXPECT_EQ(asTable(answer, repository_, 40), "root/cimv2:TEST_Base.Id=\"\\x1B[2J\"\n");
+TEST_F(ResponseTable, LetsNothingSteerTheTerminal) {
+    Response response{"EnumerateInstanceNames", {}, 0, {}, {}};
+    response.paths = {cimom::parseObjectPath("root/cimv2:TEST_Base.Id=\"\x1B[2J\"")};
+    EXPECT_EQ(asTable(response, repository_, 40), "root/cimv2:TEST_Base.Id=\"\\x1B[2J\"\n");
 }
 
 }  // namespace

@@ -1,4 +1,4 @@
-#include "commands/Operations.h"
+#include "commands/CimOperations.h"
 
 #include <utility>
 
@@ -14,41 +14,41 @@ namespace {
 std::pair<std::string, std::string> splitAssignment(const std::string& text) {
     const std::size_t sign = text.find('=');
     if (sign == std::string::npos || sign == 0) {
-        throw Failure(ExitStatus::usage,
-                      "\"" + printable(text) + "\" is no assignment of the form PROPERTY=VALUE");
+        throw Failure(ExitStatus::usage, "\"" + printable(text) +
+                                             "\" is not an assignment of the form PROPERTY=VALUE");
     }
     return {text.substr(0, sign), text.substr(sign + 1)};
 }
 
-/// What an object manager answers to a property that the class does not have.
-/// Without the declaration there is not even a type to send the value in.
-Answer noSuchProperty(const cimom::ClassDeclaration& declaration, const std::string& name) {
-    Answer answer;
-    answer.operation = "ModifyInstance";
-    answer.status = {CMPI_RC_ERR_NO_SUCH_PROPERTY,
-                     declaration.name + " has no property \"" + name + "\""};
-    return answer;
+/// The response of an object manager to a property that the class does not have. There
+/// is no type to send the value in.
+Response noSuchProperty(const cimom::ClassDeclaration& declaration, const std::string& name) {
+    Response response;
+    response.operation = "ModifyInstance";
+    response.status = {CMPI_RC_ERR_NO_SUCH_PROPERTY,
+                       declaration.name + " has no property \"" + name + "\""};
+    return response;
 }
 
 }  // namespace
 
-Request carryOut(const NamesCommand& command, Client& client) {
+CimOperation carryOut(const NamesCommand& command, Client& client) {
     const cimom::ObjectPath path = readClassArgument(command.className, client.nameSpace());
     return {path, client.enumerateNames(path)};
 }
 
-Request carryOut(const InstancesCommand& command, Client& client) {
+CimOperation carryOut(const InstancesCommand& command, Client& client) {
     const cimom::ObjectPath path = readClassArgument(command.className, client.nameSpace());
     return {path, client.enumerate(path)};
 }
 
-Request carryOut(const GetCommand& command, Client& client) {
+CimOperation carryOut(const GetCommand& command, Client& client) {
     const cimom::ObjectPath path =
         readPathArgument(command.path, client.nameSpace(), client.classes());
     return {path, client.get(path)};
 }
 
-Request carryOut(const ModifyCommand& command, Client& client) {
+CimOperation carryOut(const ModifyCommand& command, Client& client) {
     cimom::Instance instance;
     instance.path = readPathArgument(command.path, client.nameSpace(), client.classes());
     const cimom::ClassDeclaration* const declaration =
@@ -72,7 +72,7 @@ Request carryOut(const ModifyCommand& command, Client& client) {
     return {instance.path, client.modify(instance)};
 }
 
-Request carryOut(const AssociatorsCommand& command, Client& client) {
+CimOperation carryOut(const AssociatorsCommand& command, Client& client) {
     const cimom::ObjectPath path =
         readPathArgument(command.path, client.nameSpace(), client.classes());
     cimom::AssociationRequest request;
@@ -84,7 +84,7 @@ Request carryOut(const AssociatorsCommand& command, Client& client) {
                                 : client.associators(path, request)};
 }
 
-Request carryOut(const ReferencesCommand& command, Client& client) {
+CimOperation carryOut(const ReferencesCommand& command, Client& client) {
     const cimom::ObjectPath path =
         readPathArgument(command.path, client.nameSpace(), client.classes());
     cimom::AssociationRequest request;

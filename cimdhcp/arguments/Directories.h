@@ -1,0 +1,16 @@
+#pragma once
+
+#include <vector>
+
+#include "arguments/CommandLine.h"
+#include "client/Installation.h"
+
+namespace cimdhcp {
+
+/// The first installation with a schema; what the options name takes the place of
+/// its parts. Throws Failure that names the places looked at when there is none,
+/// or when a directory that an option names does not exist.
+[[nodiscard]] Directories findDirectories(const Options& options,
+                                          const std::vector<Directories>& installations);
+
+}  // namespace cimdhcp
