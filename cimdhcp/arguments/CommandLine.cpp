@@ -4,13 +4,12 @@
 #include <algorithm>
 #include <map>
 #include <memory>
-#include <stdexcept>
 
 #include "arguments/HelpFormatter.h"
 #include "arguments/OptionGroups.h"
-#include "arguments/ServeOptions.h"
-#include "client/Failure.h"
+#include "arguments/OptionRules.h"
 #include "text/DisplayText.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 
@@ -18,9 +17,9 @@ namespace {
 
 constexpr const char* description =
     "Shows and changes how the network interfaces of this machine use DHCP.\n"
-    "Everything is asked of the CIM provider of the machine's DHCP clients, in this\n"
-    "process: no object manager has to be installed or running. With --connect or\n"
-    "--hosts, the WBEM servers of other machines are asked.";
+    "The CIM provider of the machine's DHCP clients tells all of it, in this process:\n"
+    "no object manager has to be installed or running. With --connect or --hosts,\n"
+    "requests go to the WBEM servers of other machines.";
 
 constexpr const char* pathHelp =
     "PATH names an instance as CLASS.KEY=\"VALUE\"[,KEY=\"VALUE\"...]; a namespace and a\n"
@@ -42,11 +41,11 @@ Examples:
 
 Exit status:
   0  done
-  1  the answer is another CIM status than OK (its name is on standard error), or
-     a rename was not possible
+  1  the response has a CIM status other than OK (its name is on standard error),
+     or a rename was not possible
   2  the command line cannot be understood
-  3  the provider or a file cannot be loaded, a server not be reached or
-     understood, or the output not be written
+  3  the provider or a file cannot be loaded, a server cannot be reached or
+     understood, or the output cannot be written
   4  some of several servers have failed
   130  interrupted while servers were asked
 
@@ -54,7 +53,7 @@ Schema, registrations and providers are those that are installed with the progra
 unless an advanced option or one of the environment variables CIMDHCP_SCHEMA_DIR,
 CIMDHCP_REGISTRATION_DIR and CIMDHCP_PROVIDER_DIR names others.
 
-"cimdhcp COMMAND --help" tells more about a command. The options above may stand
+"cimdhcp COMMAND --help" explains a command. The options above may stand
 before or behind the command.)";
 
 constexpr const char* machineGroup = "The machine";
@@ -74,8 +73,8 @@ bool takesValue(const CLI::App& app, const std::string& option) {
                        [&](const CLI::App* command) { return takesValue(*command, option); });
 }
 
-/// "--option=" as an option and an empty value, which the parser would look for in the
-/// next argument.
+/// Splits "--option=" into the option and an empty value: the parser would take the next
+/// argument for the value.
 std::vector<std::string> withEmptyValues(const CLI::App& app,
                                          const std::vector<std::string>& arguments) {
     std::vector<std::string> result;
@@ -95,7 +94,7 @@ std::vector<std::string> withEmptyValues(const CLI::App& app,
     return result;
 }
 
-/// What stands behind the commands' names while a line is being read.
+/// What is read of each command.
 struct Records {
     ShowCommand show;
     RenameCommand rename;
@@ -124,14 +123,14 @@ class CommandLineReader::Parser {
         app_.set_help_flag("-h,--help", "Print this help");
         // Options may stand behind the command, too.
         app_.fallthrough();
-        // One at most; that there is one is checked below, in better words.
+        // One at most. read() checks that there is one, for a better message.
         app_.require_subcommand(0, 1);
         addOptions();
         addMachineCommands();
         addInstanceCommands();
         addAssociationCommands();
         addServerCommands();
-        // Commands made after this would take the footer over.
+        // Commands inherit the footer when they are made: they are made before it.
         app_.footer(std::string(pathHelp) + '\n' + footer);
     }
 
@@ -152,7 +151,7 @@ class CommandLineReader::Parser {
         if (app_.get_subcommands().empty()) {
             refuse("a command is missing");
         }
-        normalize();
+        completeCommandLine(line_);
         return line_;
     }
 
@@ -178,7 +177,7 @@ class CommandLineReader::Parser {
                         "Directory of the ifcfg-INTERFACE files")
             ->type_name("DIR");
         app_.add_option("--namespace", line_.options.nameSpace,
-                        "The CIM namespace; root/cimv2 if none is given")
+                        "The CIM namespace; root/cimv2 by default")
             ->type_name("NS");
         const std::map<std::string, Format> formats{
             {"table", Format::table}, {"mof", Format::mof}, {"json", Format::json}};
@@ -239,13 +238,13 @@ class CommandLineReader::Parser {
         CLI::App* const tree = command(
             "tree", machineGroup, "What is known of the machine, as a JSON tree", records_.tree);
         tree->add_flag("--explain", records_.tree.explain,
-                       "With each property, where it came from and why that counts");
+                       "Add where each property came from, and why that counts");
     }
 
     void addInstanceCommands() {
         command("classes", classGroup, "The served classes", records_.classes);
         CLI::App* const names =
-            command("names", classGroup, "The paths of a class' instances", records_.names);
+            command("names", classGroup, "The paths of the instances of a class", records_.names);
         names->add_option("CLASS", records_.names.className, "The class, or a parent of it")
             ->required();
         CLI::App* const instances =
@@ -289,7 +288,7 @@ class CommandLineReader::Parser {
 
     void addServerCommands() {
         CLI::App* const serve =
-            command("serve", serverGroup, "Answer WBEM clients: CIM-XML over HTTP", records_.serve);
+            command("serve", serverGroup, "Serve WBEM clients: CIM-XML over HTTP", records_.serve);
         command("check", serverGroup, "Tell why something is empty or does not work",
                 records_.check);
         addServeOptions(*serve, records_.serve);
@@ -315,50 +314,6 @@ class CommandLineReader::Parser {
     static void addFilter(CLI::App* app, const char* option, std::optional<std::string>& value,
                           const char* type, const char* text) {
         app->add_option(option, value, text)->type_name(type);
-    }
-
-    void normalize() {
-        Options& options = line_.options;
-        std::string& nameSpace = options.nameSpace;
-        nameSpace.erase(0, nameSpace.find_first_not_of('/'));
-        nameSpace.erase(nameSpace.find_last_not_of('/') + 1);
-        if (nameSpace.empty()) {
-            throw Failure(ExitStatus::usage, "--namespace needs a name, such as root/cimv2");
-        }
-        for (const auto& [name, value] :
-             {std::pair{"--tree", &options.tree}, std::pair{"--data-dir", &options.dataDir}}) {
-            if (*value && (*value)->empty()) {
-                throw Failure(ExitStatus::usage, std::string(name) + " needs a name");
-            }
-        }
-        if (options.format == Format::json && std::holds_alternative<GraphCommand>(line_.command)) {
-            throw Failure(ExitStatus::usage,
-                          "a graph has no JSON output; it is in Graphviz' language, or with --svg "
-                          "drawn");
-        }
-        if (const auto* const serve = std::get_if<ServeCommand>(&line_.command)) {
-            try {
-                serve->limits.check();
-            } catch (const std::invalid_argument& error) {
-                throw Failure(ExitStatus::usage, std::string("--") + error.what());
-            }
-        }
-        checkOptionsFor(line_);
-        if (options.format == Format::mof && !hasMofForm()) {
-            throw Failure(ExitStatus::usage,
-                          "this command has no MOF output; use --format table or json");
-        }
-    }
-
-    [[nodiscard]] bool hasMofForm() const {
-        return !std::holds_alternative<ShowCommand>(line_.command) &&
-               !std::holds_alternative<RenameCommand>(line_.command) &&
-               !std::holds_alternative<GraphCommand>(line_.command) &&
-               !std::holds_alternative<TreeCommand>(line_.command) &&
-               !std::holds_alternative<ClassesCommand>(line_.command) &&
-               !std::holds_alternative<ServeCommand>(line_.command) &&
-               !std::holds_alternative<UserAddCommand>(line_.command) &&
-               !std::holds_alternative<CheckCommand>(line_.command);
     }
 
     CommandLine line_;

@@ -2,19 +2,16 @@
 
 #include <chrono>
 #include <cstddef>
-#include <cstdint>
 #include <memory>
 #include <optional>
 #include <string>
 #include <variant>
 #include <vector>
 
-#include "text/Style.h"
+#include "text/Presentation.h"
 #include "wbem/Limits.h"
 
 namespace cimdhcp {
-
-enum class Format : std::uint8_t { table, mof, json };
 
 /// What holds for every command.
 struct Options {
@@ -35,7 +32,7 @@ struct Options {
     bool insecure = false;
     std::optional<std::string> credentials;
 
-    // How the answer is shown.
+    // How the result is shown.
     bool noHeader = false;
     std::optional<std::string> sort;
     bool count = false;
@@ -143,15 +140,15 @@ struct CommandLine {
     bool operator==(const CommandLine&) const = default;
 };
 
-/// A text that the person asked for: the help or the version.
+/// A text that was asked for: the help or the version.
 struct Information {
     std::string text;
 
     bool operator==(const Information&) const = default;
 };
 
-/// Reads command lines, one after the other; none leaves anything to the next.
-/// One thread at a time.
+/// Reads command lines, one after the other, each as if it were the first. To be used
+/// by one thread at a time.
 class CommandLineReader {
   public:
     CommandLineReader();

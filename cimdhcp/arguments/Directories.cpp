@@ -1,24 +1,16 @@
 #include "arguments/Directories.h"
 
 #include <algorithm>
+#include <string>
 #include <system_error>
 
-#include "client/Failure.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 
 namespace {
 
 namespace fs = std::filesystem;
-
-/// A schema is there when there is a MOF file.
-bool hasSchema(const fs::path& directory) {
-    std::error_code error;
-    const fs::directory_iterator files(directory, error);
-    return !error && std::any_of(begin(files), end(files), [](const fs::directory_entry& entry) {
-        return entry.path().extension() == ".mof";
-    });
-}
 
 void requireDirectory(const fs::path& directory, const char* option, const char* variable) {
     std::error_code error;
@@ -29,18 +21,6 @@ void requireDirectory(const fs::path& directory, const char* option, const char*
 }
 
 }  // namespace
-
-std::vector<Directories> installations(const fs::path& executable) {
-    const fs::path prefix = executable.parent_path().parent_path();
-    const fs::path schema = prefix / "share/dhcp-client-provider/schema";
-    const fs::path plain = prefix / "lib/cmpi";
-    Directories own{schema, schema, {prefix / CIMDHCP_LIBDIR "/cmpi"}};
-    if (own.providers.front() != plain) {
-        own.providers.push_back(plain);
-    }
-    const fs::path configured = CIMDHCP_FULL_DATADIR "/dhcp-client-provider/schema";
-    return {own, {configured, configured, {CIMDHCP_FULL_LIBDIR "/cmpi"}}};
-}
 
 Directories findDirectories(const Options& options, const std::vector<Directories>& installations) {
     const auto found =
@@ -73,35 +53,6 @@ Directories findDirectories(const Options& options, const std::vector<Directorie
         result.providers = {*options.providerDir};
     }
     return result;
-}
-
-fs::path executableFile() {
-    std::error_code error;
-    fs::path file = fs::read_symlink("/proc/self/exe", error);
-    if (error) {
-        throw Failure(ExitStatus::notLoaded, "/proc/self/exe: " + error.message());
-    }
-    return file;
-}
-
-std::vector<fs::path> registrationFiles(const fs::path& directory) {
-    std::error_code error;
-    std::vector<fs::path> files;
-    for (fs::directory_iterator entry(directory, error); !error && entry != end(entry);
-         entry.increment(error)) {
-        if (entry->path().extension() == ".registration") {
-            files.push_back(entry->path());
-        }
-    }
-    if (error) {
-        throw Failure(ExitStatus::notLoaded, directory.string() + ": " + error.message());
-    }
-    if (files.empty()) {
-        throw Failure(ExitStatus::notLoaded,
-                      directory.string() + ": no *.registration file is in it");
-    }
-    std::sort(files.begin(), files.end());
-    return files;
 }
 
 }  // namespace cimdhcp

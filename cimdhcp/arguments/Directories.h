@@ -1,40 +1,16 @@
 #pragma once
 
-#include <filesystem>
-#include <optional>
-#include <string>
 #include <vector>
 
 #include "arguments/CommandLine.h"
+#include "client/Installation.h"
 
 namespace cimdhcp {
-
-/// Where schema, registrations and provider libraries are, or are looked for.
-struct Directories {
-    std::filesystem::path schema;
-    std::filesystem::path registrations;
-    std::vector<std::filesystem::path> providers;  ///< searched in this order
-
-    bool operator==(const Directories&) const = default;
-};
-
-/// The places where an installation can be: first the one that the executable is
-/// part of, its prefix being the parent of its directory (which a build tree has
-/// the form of, too), then the one that the program was configured for.
-[[nodiscard]] std::vector<Directories> installations(const std::filesystem::path& executable);
 
 /// The first installation with a schema; what the options name takes the place of
 /// its parts. Throws Failure that names the places looked at when there is none,
 /// or when a directory that an option names does not exist.
 [[nodiscard]] Directories findDirectories(const Options& options,
                                           const std::vector<Directories>& installations);
-
-/// The file of this process' program. Throws Failure.
-[[nodiscard]] std::filesystem::path executableFile();
-
-/// The *.registration files of a directory in the order of their names. Throws
-/// Failure when the directory cannot be read or has none.
-[[nodiscard]] std::vector<std::filesystem::path> registrationFiles(
-    const std::filesystem::path& directory);
 
 }  // namespace cimdhcp

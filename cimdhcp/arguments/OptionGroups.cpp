@@ -1,10 +1,12 @@
 #include "arguments/OptionGroups.h"
 
+#include <CLI/CLI.hpp>
+#include <chrono>
+#include <cstddef>
+#include <cstdint>
 #include <map>
+#include <optional>
 #include <string>
-
-#include "client/Failure.h"
-#include "commands/ClientCommands.h"
 
 namespace cimdhcp {
 
@@ -15,31 +17,38 @@ constexpr const char* outputGroup = "The output";
 constexpr int mostParallel = 256;
 constexpr int longestTimeout = 86400;
 
-void checkServers(const CommandLine& line) {
-    const Options& options = line.options;
-    if (!options.remote()) {
-        const bool given = options.credentials || options.caCertificate || options.insecure;
-        if (given) {
-            throw Failure(ExitStatus::usage,
-                          "--credentials, --cacert and --insecure are about servers; name "
-                          "one with --connect, or several with --hosts");
-        }
-        return;
-    }
-    if (!asksClient(line.command)) {
-        throw Failure(ExitStatus::usage,
-                      "this command is about this machine alone; --connect and --hosts are "
-                      "not for it");
-    }
-    if (options.tree || options.dataDir) {
-        throw Failure(ExitStatus::usage,
-                      "--tree and --data-dir are about this machine; they cannot be given "
-                      "with --connect or --hosts");
-    }
-    const auto* const rename = std::get_if<RenameCommand>(&line.command);
-    if (rename != nullptr && rename->create) {
-        throw Failure(ExitStatus::usage, "--create cannot make files on other machines");
-    }
+constexpr const char* limitGroup = "Limits of what a client may cost; none can be switched off";
+
+void addLimits(CLI::App& app, cimom::wbem::Limits& limits) {
+    const auto number = [&app](const char* option, std::size_t& value, const char* text) {
+        app.add_option(option, value, text)->type_name("N")->group(limitGroup);
+    };
+    const auto seconds = [&app](const char* option, std::chrono::seconds& value, const char* text) {
+        app.add_option_function<std::uint32_t>(
+               option,
+               [&value](const std::uint32_t& given) { value = std::chrono::seconds(given); }, text)
+            ->type_name("SECONDS")
+            ->group(limitGroup);
+    };
+    number("--max-header-line", limits.headerLine, "Bytes of one header (8192)");
+    number("--max-headers", limits.headers, "Bytes of all headers (16384)");
+    number("--max-body", limits.body, "Bytes of a request (1048576)");
+    number("--max-depth", limits.depth, "Depth of a request's XML (64)");
+    number("--max-connections", limits.connections, "Open connections (512)");
+    number("--max-waiting", limits.waiting, "Requests that wait for a worker (256)");
+    number("--max-enumerations", limits.sessions.sessions, "Open enumerations (64)");
+    number("--max-result", limits.result, "Bytes of a result (1073741824)");
+    number("--workers", limits.workers, "Operations at the same time (4)");
+    number("--max-stuck", limits.stuck,
+           "Further workers, for those whose operation does not return (16)");
+    number("--io-threads", limits.ioThreads, "Threads that read and send (2)");
+    seconds("--request-timeout", limits.request,
+            "For a request to arrive, and again for its operation (30)");
+    seconds("--answer-timeout", limits.answer, "For a client to take its response (300)");
+    seconds("--enumeration-timeout", limits.sessions.defaultTimeout,
+            "Silence after which an open enumeration is forgotten (60)");
+    seconds("--max-enumeration-timeout", limits.sessions.longestTimeout,
+            "The longest such silence that a client may ask for (600)");
 }
 
 }  // namespace
@@ -53,7 +62,7 @@ void addRemoteOptions(CLI::App& app, Options& options) {
                    "A WBEM server to ask, https://HOST; may be repeated")
         ->type_name("URL")
         ->expected(1)
-        // Or the parser would take "[::1]" for a list, and the brackets off.
+        // Otherwise the parser takes "[::1]" for a list, and strips the brackets.
         ->allow_extra_args(false)
         ->multi_option_policy(CLI::MultiOptionPolicy::TakeAll)
         ->group(serversGroup);
@@ -66,7 +75,7 @@ void addRemoteOptions(CLI::App& app, Options& options) {
     app.add_option_function<unsigned>(
            "--timeout",
            [&options](const unsigned& given) { options.timeout = std::chrono::seconds(given); },
-           "For all that is asked of one server (30)")
+           "For all requests to one server together (30)")
         ->type_name("SECONDS")
         ->check(CLI::Range(1, longestTimeout).description(""))
         ->group(serversGroup);
@@ -82,8 +91,7 @@ void addOutputOptions(CLI::App& app, Options& options) {
     app.add_option("--sort", options.sort, "Sort by a column, by PATH or by a property")
         ->type_name("COLUMN")
         ->group(outputGroup);
-    app.add_flag("--count", options.count, "How many there are, and nothing else")
-        ->group(outputGroup);
+    app.add_flag("--count", options.count, "The number of results alone")->group(outputGroup);
     app.add_flag("--time", options.time, "Tell how long it took")->group(outputGroup);
     const std::map<std::string, ColorMode> modes{
         {"auto", ColorMode::automatic}, {"always", ColorMode::always}, {"never", ColorMode::never}};
@@ -99,13 +107,21 @@ void addOutputOptions(CLI::App& app, Options& options) {
         ->group(outputGroup);
 }
 
-void checkOptionsFor(const CommandLine& line) {
-    const Options& options = line.options;
-    checkServers(line);
-    if ((options.sort || options.count) && !answersList(line.command)) {
-        throw Failure(ExitStatus::usage, "this command answers no list: there is nothing to " +
-                                             std::string(options.sort ? "sort" : "count"));
-    }
+void addServeOptions(CLI::App& app, ServeCommand& serve) {
+    app.add_option("--listen", serve.listen,
+                   "Where to listen; 127.0.0.1 by default. Any address that other "
+                   "machines reach needs TLS and users")
+        ->type_name("ADDRESS[:PORT]");
+    const auto file = [&app](const char* option, std::optional<std::string>& value,
+                             const char* text) {
+        app.add_option(option, value, text)->type_name("FILE");
+    };
+    file("--tls-cert", serve.tlsCertificate,
+         "The certificate with its chain (PEM); the port is then 5989");
+    file("--tls-key", serve.tlsKey, "Its private key (PEM)");
+    file("--users", serve.users, "Only these users, made by \"cimdhcp user add\"");
+    app.add_flag("--read-only", serve.readOnly, "No client may modify");
+    addLimits(app, serve.limits);
 }
 
 }  // namespace cimdhcp

@@ -1,21 +1,22 @@
 #pragma once
 
-#include <CLI/CLI.hpp>
-
 #include "arguments/CommandLine.h"
+
+namespace CLI {
+class App;
+}
 
 namespace cimdhcp {
 
-// Options that hold for many commands. They are read into `options`, which must live
-// as long as the parser.
+// Options that stand together in the help. They are read into `options` and `serve`,
+// which must live as long as the parser.
 
 /// Which servers are asked, and how.
 void addRemoteOptions(CLI::App& app, Options& options);
-/// How answers are shown.
+/// How results are shown.
 void addOutputOptions(CLI::App& app, Options& options);
-
-/// Throws Failure with ExitStatus::usage when these options do not fit together, or
-/// not to the command.
-void checkOptionsFor(const CommandLine& line);
+/// The command that serves WBEM clients: where it listens, who may send requests, and
+/// what a client may cost.
+void addServeOptions(CLI::App& app, ServeCommand& serve);
 
 }  // namespace cimdhcp

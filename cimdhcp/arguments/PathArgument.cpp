@@ -4,8 +4,8 @@
 #include <string_view>
 
 #include "cimom/ObjectPathText.h"
-#include "client/Failure.h"
 #include "text/DisplayText.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 
@@ -52,7 +52,7 @@ cimom::ObjectPath readPathArgument(const std::string& text, const std::string& d
     if (keyed && path.keys.empty()) {
         throw Failure(ExitStatus::usage,
                       "\"" + printable(text) +
-                          "\" names a class and no instance: its keys are missing; list the "
+                          "\" names a class, not an instance: its keys are missing; list the "
                           "paths with: cimdhcp names " +
                           path.className);
     }

@@ -11,8 +11,8 @@ namespace cimdhcp {
 [[nodiscard]] cimom::ObjectPath readClassArgument(const std::string& text,
                                                   const std::string& defaultNamespace);
 
-/// Reads the path of an instance. A class that has keys wants at least one of them
-/// in the path: without any it would name a class. Throws Failure.
+/// Reads the path of an instance. For a class that has keys the path needs at least
+/// one: a path without keys names a class. Throws Failure.
 [[nodiscard]] cimom::ObjectPath readPathArgument(const std::string& text,
                                                  const std::string& defaultNamespace,
                                                  const ClassLookup& classes);

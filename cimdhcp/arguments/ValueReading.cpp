@@ -10,8 +10,8 @@
 #include <system_error>
 
 #include "cimom/ObjectPathText.h"
-#include "client/Failure.h"
 #include "text/DisplayText.h"
+#include "text/Failure.h"
 #include "text/IntegerText.h"
 #include "zrcommon/Strings.h"
 

@@ -1,14 +1,10 @@
 #pragma once
 
-#include <cstddef>
-#include <optional>
 #include <string>
 #include <vector>
 
 #include "cimom/ClassRepository.h"
 #include "cimom/ObjectManager.h"
-#include "text/Columns.h"
-#include "text/Style.h"
 
 namespace cimdhcp {
 
@@ -28,13 +24,5 @@ struct ClassEntry {
 [[nodiscard]] std::vector<ClassEntry> servedClasses(
     const std::vector<cimom::Registration>& registrations,
     const cimom::ClassRepository& repository);
-
-[[nodiscard]] const std::vector<Column<ClassEntry>>& classColumns();
-
-[[nodiscard]] std::string classTable(const std::vector<ClassEntry>& classes,
-                                     std::optional<std::size_t> width, const Style& style = {});
-
-/// {"classes": [{"class", "superclass", "kind", "provider", "namespaces"}]}
-[[nodiscard]] std::string classJson(const std::vector<ClassEntry>& classes);
 
 }  // namespace cimdhcp

@@ -7,17 +7,17 @@
 #include <vector>
 
 #include "cimom/ObjectManager.h"
-#include "client/Answer.h"
 #include "client/ClassList.h"
 #include "client/ClassLookup.h"
-#include "client/Failure.h"
-#include "commands/MachineOverview.h"
+#include "client/MachineInterfaces.h"
+#include "client/Response.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 
-/// What the commands ask: the object manager of this process (EmbeddedClient) or a
-/// WBEM server (RemoteClient). Every answer has a CIM status; what keeps an operation
-/// from having one throws Failure. To be used by one thread at a time.
+/// Sends the requests of the commands to the object manager of this process
+/// (EmbeddedClient) or to a WBEM server (RemoteClient). Every response has a CIM status;
+/// an operation that ends without one throws Failure. To be used by one thread at a time.
 class Client {
   public:
     virtual ~Client() = default;
@@ -34,31 +34,38 @@ class Client {
     /// Borrows the client.
     [[nodiscard]] virtual ClassLookup classes() = 0;
     [[nodiscard]] virtual std::vector<ClassEntry> servedClasses() = 0;
-    /// False: no provider serves the class, so that an empty answer means nothing.
+    /// False: no provider serves the class, so that an empty response means nothing.
     [[nodiscard]] virtual bool mayServe(std::string_view className) const = 0;
     /// The interfaces of the machine, with nothing about DHCP yet.
     [[nodiscard]] virtual MachineInterfaces interfaces(const ServedInstances& served) = 0;
-    /// Where this machine's ifcfg-INTERFACE files are, with "/" at its end; none:
-    /// another machine is asked.
+    /// Where the ifcfg-INTERFACE files of the machine are, with "/" at the end; none
+    /// for another machine than this one.
     [[nodiscard]] virtual std::optional<std::string> dataDir() const = 0;
 
-    virtual Answer enumerateNames(const cimom::ObjectPath& path) = 0;
-    virtual Answer enumerate(const cimom::ObjectPath& path) = 0;
-    virtual Answer get(const cimom::ObjectPath& path) = 0;
+    virtual Response enumerateNames(const cimom::ObjectPath& path) = 0;
+    virtual Response enumerate(const cimom::ObjectPath& path) = 0;
+    virtual Response get(const cimom::ObjectPath& path) = 0;
     /// Changes the properties that the instance has, and no others.
-    virtual Answer modify(const cimom::Instance& instance) = 0;
-    virtual Answer associatorNames(const cimom::ObjectPath& path,
-                                   const cimom::AssociationRequest& request) = 0;
-    virtual Answer associators(const cimom::ObjectPath& path,
-                               const cimom::AssociationRequest& request) = 0;
-    virtual Answer referenceNames(const cimom::ObjectPath& path,
-                                  const cimom::AssociationRequest& request) = 0;
-    virtual Answer references(const cimom::ObjectPath& path,
-                              const cimom::AssociationRequest& request) = 0;
+    virtual Response modify(const cimom::Instance& instance) = 0;
+    virtual Response associatorNames(const cimom::ObjectPath& path,
+                                     const cimom::AssociationRequest& request) = 0;
+    virtual Response associators(const cimom::ObjectPath& path,
+                                 const cimom::AssociationRequest& request) = 0;
+    virtual Response referenceNames(const cimom::ObjectPath& path,
+                                    const cimom::AssociationRequest& request) = 0;
+    virtual Response references(const cimom::ObjectPath& path,
+                                const cimom::AssociationRequest& request) = 0;
 
-    /// What an answer that is not OK ends the command with.
-    [[nodiscard]] virtual Failure failure(const Answer& answer,
+    /// What a command throws for a response that is not OK.
+    [[nodiscard]] virtual Failure failure(const Response& response,
                                           const cimom::ObjectPath& asked) const = 0;
+
+    /// The paths of all instances of a class. Throws Failure for a response that is not OK.
+    [[nodiscard]] std::vector<cimom::ObjectPath> pathsIn(const std::string& className);
+    /// All instances of a class; none when the class is not served. Throws Failure for any
+    /// other response that is not OK.
+    [[nodiscard]] std::optional<std::vector<cimom::Instance>> instancesIn(
+        const std::string& className);
 
   protected:
     explicit Client(std::string nameSpace) : nameSpace_(std::move(nameSpace)) {}

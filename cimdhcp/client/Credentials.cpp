@@ -12,8 +12,8 @@
 #include <system_error>
 
 #include "cimom/Cim.h"
-#include "client/Failure.h"
 #include "text/DisplayText.h"
+#include "text/Failure.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace cimdhcp {
@@ -25,7 +25,7 @@ class Words {
   public:
     Words(std::string_view text, const std::string& name) : rest_(text), name_(name) {}
 
-    /// Nothing at the end.
+    /// None at the end.
     std::optional<std::string> next() {
         skip();
         if (rest_.empty()) {
@@ -65,7 +65,7 @@ class Words {
         lineStart_ = false;
     }
 
-    /// A password may hold the sign, so that it counts at the beginning of a line alone.
+    /// Only at the beginning of a line: a password may hold the sign.
     [[nodiscard]] bool comment() const noexcept { return lineStart_ && rest_.front() == '#'; }
 
     std::string plain() {
@@ -134,7 +134,7 @@ void checkStatus(int fd, const std::string& name, const std::string& file) {
         throw Failure(ExitStatus::notLoaded, name + ": " + std::strerror(errno));
     }
     if (!S_ISREG(status.st_mode)) {
-        throw Failure(ExitStatus::notLoaded, name + ": is no regular file");
+        throw Failure(ExitStatus::notLoaded, name + ": is not a regular file");
     }
     if (status.st_uid != ::geteuid() && status.st_uid != 0) {
         throw Failure(
@@ -203,7 +203,7 @@ std::vector<Credential> parseCredentials(std::string_view text, const std::strin
 
 std::vector<Credential> readCredentials(const std::string& file) {
     const std::string name = printable(file);
-    // Not to wait for the writer of a pipe.
+    // O_NONBLOCK: opening a pipe would wait for its writer.
     const ZR::UniqueFd fd(::open(file.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
     if (!fd) {
         throw Failure(ExitStatus::notLoaded, name + ": " + std::strerror(errno));

@@ -8,7 +8,7 @@
 
 namespace cimdhcp {
 
-/// Who may ask a server.
+/// A user of a server.
 struct Credential {
     std::string host;                   ///< as in the URL, an IPv6 address without brackets
     std::optional<std::uint16_t> port;  ///< none: any
@@ -29,8 +29,8 @@ struct Credential {
 /// read or write, or whose owner is neither the caller nor root.
 [[nodiscard]] std::vector<Credential> readCredentials(const std::string& file);
 
-/// The first for the host and the port; one for the port itself counts before one
-/// for any. Null: there is none.
+/// The first one for the host and the port; one that names the port counts before one
+/// for any port. Null: there is none.
 [[nodiscard]] const Credential* credentialFor(const std::vector<Credential>& credentials,
                                               std::string_view host, std::uint16_t port) noexcept;
 

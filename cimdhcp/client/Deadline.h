@@ -5,7 +5,7 @@
 
 namespace cimdhcp {
 
-/// The time at which patience ends.
+/// A point in time, a while from its construction.
 class Deadline {
   public:
     using Clock = std::chrono::steady_clock;

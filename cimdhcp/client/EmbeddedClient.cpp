@@ -12,12 +12,12 @@ namespace cimdhcp {
 
 namespace {
 
-Answer answerOf(const char* operation, cimom::PathsResult result) {
+Response responseOf(const char* operation, cimom::PathsResult result) {
     return {
         operation, std::move(result.status), result.returnDoneCalls, std::move(result.paths), {}};
 }
 
-Answer answerOf(const char* operation, cimom::InstancesResult result) {
+Response responseOf(const char* operation, cimom::InstancesResult result) {
     return {operation,
             std::move(result.status),
             result.returnDoneCalls,
@@ -72,50 +72,50 @@ std::optional<std::string> EmbeddedClient::dataDir() const {
     return ZR::PlatformUtilities::getKestraDataDir();
 }
 
-Answer EmbeddedClient::enumerateNames(const cimom::ObjectPath& path) {
-    return answerOf("EnumerateInstanceNames", manager_->enumerateInstanceNames(path));
+Response EmbeddedClient::enumerateNames(const cimom::ObjectPath& path) {
+    return responseOf("EnumerateInstanceNames", manager_->enumerateInstanceNames(path));
 }
 
-Answer EmbeddedClient::enumerate(const cimom::ObjectPath& path) {
-    return answerOf("EnumerateInstances", manager_->enumerateInstances(path));
+Response EmbeddedClient::enumerate(const cimom::ObjectPath& path) {
+    return responseOf("EnumerateInstances", manager_->enumerateInstances(path));
 }
 
-Answer EmbeddedClient::get(const cimom::ObjectPath& path) {
-    return answerOf("GetInstance", manager_->getInstance(path));
+Response EmbeddedClient::get(const cimom::ObjectPath& path) {
+    return responseOf("GetInstance", manager_->getInstance(path));
 }
 
-Answer EmbeddedClient::modify(const cimom::Instance& instance) {
+Response EmbeddedClient::modify(const cimom::Instance& instance) {
     cimom::InstanceRequest request;
     request.propertyList.emplace();
     for (const cimom::NamedValue& property : instance.properties) {
         request.propertyList->push_back(property.name);
     }
-    return answerOf("ModifyInstance", manager_->modifyInstance(instance, request));
+    return responseOf("ModifyInstance", manager_->modifyInstance(instance, request));
 }
 
-Answer EmbeddedClient::associatorNames(const cimom::ObjectPath& path,
-                                       const cimom::AssociationRequest& request) {
-    return answerOf("AssociatorNames", manager_->associatorNames(path, request));
+Response EmbeddedClient::associatorNames(const cimom::ObjectPath& path,
+                                         const cimom::AssociationRequest& request) {
+    return responseOf("AssociatorNames", manager_->associatorNames(path, request));
 }
 
-Answer EmbeddedClient::associators(const cimom::ObjectPath& path,
-                                   const cimom::AssociationRequest& request) {
-    return answerOf("Associators", manager_->associators(path, request));
+Response EmbeddedClient::associators(const cimom::ObjectPath& path,
+                                     const cimom::AssociationRequest& request) {
+    return responseOf("Associators", manager_->associators(path, request));
 }
 
-Answer EmbeddedClient::referenceNames(const cimom::ObjectPath& path,
-                                      const cimom::AssociationRequest& request) {
-    return answerOf("ReferenceNames", manager_->referenceNames(path, request));
+Response EmbeddedClient::referenceNames(const cimom::ObjectPath& path,
+                                        const cimom::AssociationRequest& request) {
+    return responseOf("ReferenceNames", manager_->referenceNames(path, request));
 }
 
-Answer EmbeddedClient::references(const cimom::ObjectPath& path,
-                                  const cimom::AssociationRequest& request) {
-    return answerOf("References", manager_->references(path, request));
+Response EmbeddedClient::references(const cimom::ObjectPath& path,
+                                    const cimom::AssociationRequest& request) {
+    return responseOf("References", manager_->references(path, request));
 }
 
-Failure EmbeddedClient::failure(const Answer& answer, const cimom::ObjectPath& asked) const {
-    return {answer.status.noProvider ? ExitStatus::notLoaded : ExitStatus::notDone,
-            statusMessage(answer, asked)};
+Failure EmbeddedClient::failure(const Response& response, const cimom::ObjectPath& asked) const {
+    return {response.status.noProvider ? ExitStatus::notLoaded : ExitStatus::notDone,
+            statusMessage(response, asked)};
 }
 
 }  // namespace cimdhcp

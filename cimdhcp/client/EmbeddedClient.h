@@ -4,8 +4,8 @@
 #include <string>
 #include <vector>
 
-#include "arguments/Directories.h"
 #include "client/Client.h"
+#include "client/Installation.h"
 
 namespace cimdhcp {
 
@@ -26,21 +26,21 @@ class EmbeddedClient : public Client {
     [[nodiscard]] MachineInterfaces interfaces(const ServedInstances& served) override;
     [[nodiscard]] std::optional<std::string> dataDir() const override;
 
-    Answer enumerateNames(const cimom::ObjectPath& path) override;
-    Answer enumerate(const cimom::ObjectPath& path) override;
-    Answer get(const cimom::ObjectPath& path) override;
-    Answer modify(const cimom::Instance& instance) override;
-    Answer associatorNames(const cimom::ObjectPath& path,
-                           const cimom::AssociationRequest& request) override;
-    Answer associators(const cimom::ObjectPath& path,
-                       const cimom::AssociationRequest& request) override;
-    Answer referenceNames(const cimom::ObjectPath& path,
-                          const cimom::AssociationRequest& request) override;
-    Answer references(const cimom::ObjectPath& path,
-                      const cimom::AssociationRequest& request) override;
+    Response enumerateNames(const cimom::ObjectPath& path) override;
+    Response enumerate(const cimom::ObjectPath& path) override;
+    Response get(const cimom::ObjectPath& path) override;
+    Response modify(const cimom::Instance& instance) override;
+    Response associatorNames(const cimom::ObjectPath& path,
+                             const cimom::AssociationRequest& request) override;
+    Response associators(const cimom::ObjectPath& path,
+                         const cimom::AssociationRequest& request) override;
+    Response referenceNames(const cimom::ObjectPath& path,
+                            const cimom::AssociationRequest& request) override;
+    Response references(const cimom::ObjectPath& path,
+                        const cimom::AssociationRequest& request) override;
 
     /// With notLoaded when the provider's library is the reason, else notDone.
-    [[nodiscard]] Failure failure(const Answer& answer,
+    [[nodiscard]] Failure failure(const Response& response,
                                   const cimom::ObjectPath& asked) const override;
 
   private:

@@ -14,7 +14,7 @@ namespace cimdhcp {
 
 namespace {
 
-/// Bytes of all headers of an answer.
+/// Bytes of all headers of a response.
 constexpr std::size_t longestHeaders = 65536;
 
 struct FreeHandle {
@@ -38,22 +38,22 @@ void append(Headers& list, const std::string& header) {
     if (longer == nullptr) {
         throw std::bad_alloc();
     }
-    // The list keeps its head but for the first time.
+    // The head changes only when the list was empty.
     static_cast<void>(list.release());
     list.reset(longer);
 }
 
 }  // namespace
 
-const std::string* HttpReply::header(std::string_view name) const noexcept {
+const std::string* HttpResponse::header(std::string_view name) const noexcept {
     const auto found = std::find_if(headers.begin(), headers.end(), [name](const auto& each) {
         return cimom::sameName(each.first, name);
     });
     return found == headers.end() ? nullptr : &found->second;
 }
 
-/// The handle, and what its callbacks fill. They are called from C: no exception may
-/// pass through it, so that a reason to stop is kept until it has returned.
+/// The handle, and what its callbacks fill. The callbacks are called from C, which no
+/// exception may pass through: a reason to stop is kept until the transfer has returned.
 class HttpConnection::Transfer {
   public:
     Transfer(ServerUrl url, HttpSettings settings, const Deadline& deadline)
@@ -92,7 +92,7 @@ class HttpConnection::Transfer {
         }
     }
 
-    HttpReply post(const std::vector<std::string>& headers, const std::string& body) {
+    HttpResponse post(const std::vector<std::string>& headers, const std::string& body) {
         const auto left = deadline_.left();
         if (left.count() == 0) {
             throw ConnectionError(tooLate());
@@ -101,9 +101,9 @@ class HttpConnection::Transfer {
         for (const std::string& header : headers) {
             append(list, header);
         }
-        // Nobody is asked whether the request is welcome: that would cost a second.
+        // No "100 Continue" is waited for: a server without it would cost a second.
         append(list, "Expect:");
-        reply_ = {};
+        response_ = {};
         headerBytes_ = 0;
         reason_ = Reason::none;
         error_.front() = '\0';
@@ -123,11 +123,10 @@ class HttpConnection::Transfer {
         }
         long status = 0;
         curl_easy_getinfo(handle_.get(), CURLINFO_RESPONSE_CODE, &status);
-        reply_.status = static_cast<unsigned>(status);
-        return std::move(reply_);
+        response_.status = static_cast<unsigned>(status);
+        return std::move(response_);
     }
 
-    [[nodiscard]] const ServerUrl& url() const noexcept { return url_; }
     [[nodiscard]] const HttpSettings& settings() const noexcept { return settings_; }
 
   private:
@@ -154,10 +153,10 @@ class HttpConnection::Transfer {
     static std::size_t takeBody(char* data, std::size_t /*one*/, std::size_t size, void* self) {
         Transfer& transfer = *static_cast<Transfer*>(self);
         return transfer.guarded(size, [&] {
-            if (size > transfer.settings_.longestAnswer - transfer.reply_.body.size()) {
+            if (size > transfer.settings_.longestResponse - transfer.response_.body.size()) {
                 transfer.reason_ = Reason::bodyTooLong;
             } else {
-                transfer.reply_.body.append(data, size);
+                transfer.response_.body.append(data, size);
             }
         });
     }
@@ -172,14 +171,14 @@ class HttpConnection::Transfer {
             }
             const std::string_view line(data, size);
             if (line.starts_with("HTTP/")) {
-                transfer.reply_.headers.clear();  // "100 Continue" came before
+                transfer.response_.headers.clear();  // "100 Continue" came before
             }
             const std::size_t colon = line.find(':');
             if (colon != std::string_view::npos) {
                 std::string value(line.substr(colon + 1));
                 value.erase(value.find_last_not_of(" \t\r\n") + 1);
                 value.erase(0, value.find_first_not_of(" \t"));
-                transfer.reply_.headers.emplace_back(line.substr(0, colon), std::move(value));
+                transfer.response_.headers.emplace_back(line.substr(0, colon), std::move(value));
             }
         });
     }
@@ -196,7 +195,7 @@ class HttpConnection::Transfer {
     }
 
     [[nodiscard]] std::string tooLate() const {
-        return "no answer within " +
+        return "no response within " +
                std::to_string(
                    std::chrono::ceil<std::chrono::seconds>(deadline_.patience()).count()) +
                " s; --timeout gives it longer";
@@ -215,10 +214,10 @@ class HttpConnection::Transfer {
     [[nodiscard]] std::string reasonOf(CURLcode code) const {
         switch (reason_) {
             case Reason::bodyTooLong:
-                return "the answer is longer than " + std::to_string(settings_.longestAnswer) +
+                return "the response is longer than " + std::to_string(settings_.longestResponse) +
                        " bytes";
             case Reason::headersTooLong:
-                return "the headers of the answer are longer than " +
+                return "the headers of the response are longer than " +
                        std::to_string(longestHeaders) + " bytes";
             case Reason::interrupted:
                 return "interrupted";
@@ -243,11 +242,11 @@ class HttpConnection::Transfer {
             case CURLE_SSL_CONNECT_ERROR:
                 return "it does not speak TLS, or none that is accepted (" + detail(code) + ')';
             case CURLE_GOT_NOTHING:
-                return "it closed the connection without an answer";
+                return "it closed the connection without a response";
             case CURLE_PARTIAL_FILE:
-                return "the answer is cut off";
+                return "the response is cut off";
             default:
-                return "no usable answer (" + detail(code) + ')';
+                return "no usable response (" + detail(code) + ')';
         }
     }
 
@@ -256,7 +255,7 @@ class HttpConnection::Transfer {
     const Deadline deadline_;
     std::unique_ptr<CURL, FreeHandle> handle_;
     std::array<char, CURL_ERROR_SIZE> error_{};
-    HttpReply reply_;
+    HttpResponse response_;
     std::size_t headerBytes_ = 0;
     Reason reason_ = Reason::none;
 };
@@ -267,12 +266,9 @@ HttpConnection::HttpConnection(const ServerUrl& url, HttpSettings settings,
 
 HttpConnection::~HttpConnection() = default;
 
-HttpReply HttpConnection::post(const std::vector<std::string>& headers, const std::string& body) {
+HttpResponse HttpConnection::post(const std::vector<std::string>& headers,
+                                  const std::string& body) {
     return transfer_->post(headers, body);
-}
-
-const ServerUrl& HttpConnection::url() const noexcept {
-    return transfer_->url();
 }
 
 const HttpSettings& HttpConnection::settings() const noexcept {

@@ -16,17 +16,17 @@
 
 namespace cimdhcp {
 
-/// How a server is asked over HTTP.
+/// How to talk to a server over HTTP.
 struct HttpSettings {
     std::optional<std::string> caCertificates;  ///< a PEM file; none: the system's
-    bool insecure = false;                      ///< nobody has to vouch for the server
+    bool insecure = false;                      ///< any server is trusted
     std::optional<Credential> credential;
-    std::size_t longestAnswer = 16U << 20U;  ///< bytes of the body
+    std::size_t longestResponse = 16U << 20U;  ///< bytes of the body
     /// Requests end soon after it has become true. Borrowed; null: nothing does that.
     const std::atomic<bool>* interrupted = nullptr;
 };
 
-struct HttpReply {
+struct HttpResponse {
     unsigned status = 0;
     std::vector<std::pair<std::string, std::string>> headers;
     std::string body;
@@ -35,7 +35,7 @@ struct HttpReply {
     [[nodiscard]] const std::string* header(std::string_view name) const noexcept;
 };
 
-/// A server that cannot be asked, or gave no answer of HTTP; what() is one line
+/// A server that cannot be reached, or whose response is not HTTP; what() is one line
 /// without the server's name, with a remedy where there is one.
 class ConnectionError : public std::runtime_error {
   public:
@@ -54,9 +54,8 @@ class HttpConnection {
     HttpConnection& operator=(const HttpConnection&) = delete;
 
     /// Headers as "NAME: VALUE", without line ends in them. Throws ConnectionError.
-    HttpReply post(const std::vector<std::string>& headers, const std::string& body);
+    HttpResponse post(const std::vector<std::string>& headers, const std::string& body);
 
-    [[nodiscard]] const ServerUrl& url() const noexcept;
     [[nodiscard]] const HttpSettings& settings() const noexcept;
 
   private:

@@ -8,6 +8,7 @@
 #include "cimxml/Errors.h"
 #include "client/StatusMessage.h"
 #include "text/DisplayText.h"
+#include "text/ValueMeaning.h"
 
 namespace cimdhcp {
 
@@ -33,30 +34,30 @@ std::string excerpt(const std::string& text) {
     return printable(text.size() > shown ? text.substr(0, shown) + "..." : text);
 }
 
-void checkReply(const HttpReply& reply, const HttpSettings& settings) {
-    if (reply.status == httpOk) {
+void checkStatus(const HttpResponse& response, const HttpSettings& settings) {
+    if (response.status == httpOk) {
         return;
     }
-    if (reply.status == httpUnauthorized) {
+    if (response.status == httpUnauthorized) {
         fail(settings.credential
                  ? "HTTP 401: it refuses user " + printable(settings.credential->user) +
                        " with that password"
                  : "HTTP 401: it wants a user and a password; --credentials FILE holds them");
     }
-    if (reply.status == httpForbidden) {
+    if (response.status == httpForbidden) {
         fail("HTTP 403: it does not permit this");
     }
-    const std::string* const cimError = reply.header("CIMError");
-    fail("HTTP " + std::to_string(reply.status) + " in place of an answer" +
+    const std::string* const cimError = response.header("CIMError");
+    fail("HTTP " + std::to_string(response.status) + " in place of a response" +
          (cimError == nullptr || cimError->empty() ? "" : ": " + excerpt(*cimError)));
 }
 
-/// The status of an answer. Statuses that CMPI's type has no room for do not exist.
+/// The status of a response. A code that CMPI's type has no room for is a failure.
 cimom::Status statusOf(const OperationResponse& response) {
     constexpr unsigned last = 255;
     std::string words = response.description;
     if (cimom::sameName(words, cimom::wbem::cimStatusName(response.code))) {
-        words.clear();  // so that it can be told what the status means
+        words.clear();  // the message explains the status instead
     }
     if (response.code > last) {
         return {CMPI_RC_ERR_FAILED,
@@ -69,7 +70,7 @@ OperationRequest reading(const char* method, const cimom::ObjectPath& path) {
     return {method, path.nameSpace};
 }
 
-/// What every operation that answers instances is told about them.
+/// The parameters about the form of instances, the same in every operation.
 void addForm(OperationRequest& request) {
     request.flag("IncludeQualifiers", false).flag("IncludeClassOrigin", false);
 }
@@ -85,9 +86,9 @@ OperationRequest aboutAssociations(const char* method, const cimom::ObjectPath& 
     return request;
 }
 
-/// The path of an instance that came without one, since GetInstance does not repeat
-/// it: what was asked for. When that lacks keys, those of the class, in the instance's
-/// order.
+/// The path of an instance that came without one, as from GetInstance: the path of the
+/// request. Where that lacks keys of the class, the keys come from the instance instead,
+/// in its order.
 cimom::ObjectPath wholePath(const cimom::Instance& instance, const cimom::ObjectPath& asked,
                             const cimom::ClassDeclaration* declaration) {
     cimom::ObjectPath path = asked;
@@ -110,8 +111,8 @@ cimom::ObjectPath wholePath(const cimom::Instance& instance, const cimom::Object
     return path;
 }
 
-/// The classes that no other one derives from and that are not the standard's own. A
-/// class below an association is one, too.
+/// The classes without subclasses that are not the standard's own. A subclass of an
+/// association is an association.
 std::vector<ClassEntry> leavesOf(const std::vector<ClassEntry>& classes) {
     constexpr int deepest = 64;  // a hierarchy that goes round in circles has no end
     std::unordered_map<std::string_view, const ClassEntry*> byName;
@@ -143,59 +144,61 @@ RemoteClient::RemoteClient(const ServerUrl& url, HttpSettings settings, const De
 
 OperationResponse RemoteClient::ask(const OperationRequest& request) {
     try {
-        const HttpReply reply = connection_.post(
+        const HttpResponse response = connection_.post(
             {"Content-Type: application/xml; charset=\"utf-8\"",
              "Accept: application/xml, text/xml", "CIMOperation: MethodCall",
              "CIMMethod: " + request.method(), "CIMObject: " + request.objectHeader()},
             request.body());
-        checkReply(reply, connection_.settings());
-        return cimom::wbem::readResponse(reply.body, request.method(), deepestXml);
+        checkStatus(response, connection_.settings());
+        return cimom::wbem::readResponse(response.body, request.method(), deepestXml);
     } catch (const ConnectionError& error) {
         fail(error.what());
     } catch (const cimom::wbem::XmlError& error) {
-        fail("the answer is no XML: " + excerpt(error.what()));
+        fail("the response is not XML: " + excerpt(error.what()));
     } catch (const cimom::wbem::NotValid& error) {
-        fail("the answer is no CIM-XML: " + excerpt(error.what()));
+        fail("the response is not CIM-XML: " + excerpt(error.what()));
     }
 }
 
 template <typename Read>
-Answer RemoteClient::answerTo(const OperationRequest& request, const Read& read) {
-    OperationResponse response = ask(request);
-    Answer answer;
-    answer.operation = request.method();
-    answer.status = statusOf(response);
-    answer.returnDoneCalls.reset();
+Response RemoteClient::responseTo(const OperationRequest& request, const Read& read) {
+    OperationResponse message = ask(request);
+    Response response;
+    response.operation = request.method();
+    response.status = statusOf(message);
+    response.returnDoneCalls.reset();
     try {
-        for (const cimom::wbem::XmlElement& element : response.returned) {
-            read(element, answer);
+        for (const cimom::wbem::XmlElement& element : message.returned) {
+            read(element, response);
         }
     } catch (const cimom::wbem::NotValid& error) {
-        fail("the answer is no CIM-XML: " + excerpt(error.what()));
+        fail("the response is not CIM-XML: " + excerpt(error.what()));
     } catch (const cimom::wbem::CimError& error) {
-        fail("the answer holds what is no value: " + excerpt(error.what()));
+        fail("a value in the response is not valid: " + excerpt(error.what()));
     }
-    return answer;
+    return response;
 }
 
-Answer RemoteClient::pathsOf(const OperationRequest& request) {
-    return answerTo(request, [&request](const cimom::wbem::XmlElement& element, Answer& answer) {
-        answer.paths.emplace_back(cimom::wbem::readReturnedPath(element, request.nameSpace()));
+Response RemoteClient::pathsOf(const OperationRequest& request) {
+    return responseTo(request, [&request](const cimom::wbem::XmlElement& element,
+                                          Response& response) {
+        response.paths.emplace_back(cimom::wbem::readReturnedPath(element, request.nameSpace()));
     });
 }
 
-Answer RemoteClient::instancesOf(const OperationRequest& request) {
-    return answerTo(request, [&request](const cimom::wbem::XmlElement& element, Answer& answer) {
-        answer.instances.emplace_back(
-            cimom::wbem::readReturnedInstance(element, request.nameSpace()));
-    });
+Response RemoteClient::instancesOf(const OperationRequest& request) {
+    return responseTo(request,
+                      [&request](const cimom::wbem::XmlElement& element, Response& response) {
+                          response.instances.emplace_back(
+                              cimom::wbem::readReturnedInstance(element, request.nameSpace()));
+                      });
 }
 
-Answer RemoteClient::enumerateNames(const cimom::ObjectPath& path) {
+Response RemoteClient::enumerateNames(const cimom::ObjectPath& path) {
     return pathsOf(reading("EnumerateInstanceNames", path).className("ClassName", path.className));
 }
 
-Answer RemoteClient::enumerate(const cimom::ObjectPath& path) {
+Response RemoteClient::enumerate(const cimom::ObjectPath& path) {
     OperationRequest request = reading("EnumerateInstances", path);
     request.className("ClassName", path.className)
         .flag("LocalOnly", false)
@@ -204,22 +207,22 @@ Answer RemoteClient::enumerate(const cimom::ObjectPath& path) {
     return instancesOf(request);
 }
 
-Answer RemoteClient::get(const cimom::ObjectPath& path) {
+Response RemoteClient::get(const cimom::ObjectPath& path) {
     OperationRequest request = reading("GetInstance", path);
     request.instanceName("InstanceName", path).flag("LocalOnly", false);
     addForm(request);
-    Answer answer = instancesOf(request);
-    for (auto& instance : answer.instances) {
+    Response response = instancesOf(request);
+    for (auto& instance : response.instances) {
         instance->path = wholePath(*instance, path, findClass(instance->path.className));
         // Servers add what the class has and the provider did not say, as null, which
         // means the same as leaving it out (DSP0201, 5.2.5).
         std::erase_if(instance->properties,
                       [](const cimom::NamedValue& each) { return each.value.isNull(); });
     }
-    return answer;
+    return response;
 }
 
-Answer RemoteClient::modify(const cimom::Instance& instance) {
+Response RemoteClient::modify(const cimom::Instance& instance) {
     std::vector<std::string> names;
     for (const cimom::NamedValue& property : instance.properties) {
         names.push_back(property.name);
@@ -231,25 +234,25 @@ Answer RemoteClient::modify(const cimom::Instance& instance) {
     return instancesOf(request);
 }
 
-Answer RemoteClient::associatorNames(const cimom::ObjectPath& path,
-                                     const cimom::AssociationRequest& request) {
+Response RemoteClient::associatorNames(const cimom::ObjectPath& path,
+                                       const cimom::AssociationRequest& request) {
     return pathsOf(aboutAssociations("AssociatorNames", path, request));
 }
 
-Answer RemoteClient::associators(const cimom::ObjectPath& path,
-                                 const cimom::AssociationRequest& request) {
+Response RemoteClient::associators(const cimom::ObjectPath& path,
+                                   const cimom::AssociationRequest& request) {
     OperationRequest message = aboutAssociations("Associators", path, request);
     addForm(message);
     return instancesOf(message);
 }
 
-Answer RemoteClient::referenceNames(const cimom::ObjectPath& path,
-                                    const cimom::AssociationRequest& request) {
+Response RemoteClient::referenceNames(const cimom::ObjectPath& path,
+                                      const cimom::AssociationRequest& request) {
     return pathsOf(aboutAssociations("ReferenceNames", path, request));
 }
 
-Answer RemoteClient::references(const cimom::ObjectPath& path,
-                                const cimom::AssociationRequest& request) {
+Response RemoteClient::references(const cimom::ObjectPath& path,
+                                  const cimom::AssociationRequest& request) {
     OperationRequest message = aboutAssociations("References", path, request);
     addForm(message);
     return instancesOf(message);
@@ -267,10 +270,9 @@ const cimom::ClassDeclaration* RemoteClient::findClass(std::string_view classNam
         .flag("IncludeQualifiers", true)
         .flag("IncludeClassOrigin", false);
     std::unique_ptr<const cimom::ClassDeclaration> declaration;
-    // A server that knows the class and does not show it is as good as one that does
-    // not know it: values stand without their meanings.
+    // Without a declaration, for whatever reason, values are shown without their meanings.
     static_cast<void>(
-        answerTo(request, [&declaration](const cimom::wbem::XmlElement& element, Answer&) {
+        responseTo(request, [&declaration](const cimom::wbem::XmlElement& element, Response&) {
             declaration =
                 std::make_unique<const cimom::ClassDeclaration>(cimom::wbem::readClass(element));
         }));
@@ -288,8 +290,8 @@ std::vector<ClassEntry> RemoteClient::servedClasses() {
         .flag("IncludeQualifiers", false)
         .flag("IncludeClassOrigin", false);
     std::vector<ClassEntry> classes;
-    const Answer answer =
-        answerTo(request, [&](const cimom::wbem::XmlElement& element, Answer& /*answer*/) {
+    const Response response =
+        responseTo(request, [&](const cimom::wbem::XmlElement& element, Response& /*response*/) {
             cimom::ClassDeclaration declaration = cimom::wbem::readClass(element);
             // Only associations have references (DSP0004, 5.1.2.7).
             const bool association =
@@ -301,8 +303,8 @@ std::vector<ClassEntry> RemoteClient::servedClasses() {
                                "",
                                {nameSpace()}});
         });
-    if (!answer.status.ok()) {
-        throw failure(answer, classPath(""));
+    if (!response.status.ok()) {
+        throw failure(response, classPath(""));
     }
     return leavesOf(classes);
 }
@@ -313,17 +315,12 @@ bool RemoteClient::mayServe(std::string_view /*className*/) const {
 
 MachineInterfaces RemoteClient::interfaces(const ServedInstances& served) {
     const std::vector<cimom::Instance> nothing;
-    const auto endpoints = cimdhcp::instancesOf(*this, "QVXZR_IPProtocolEndpoint");
-    const Answer systems = enumerateNames(classPath("QVXZR_SPComputerSystem"));
-    std::vector<std::string> processors;
+    const auto endpoints = instancesIn("QVXZR_IPProtocolEndpoint");
     // A server without the class has no service processor to tell of.
+    const Response systems = enumerateNames(classPath("QVXZR_SPComputerSystem"));
+    std::vector<std::string> processors;
     for (const auto& path : systems.paths) {
-        const cimom::Value* const name = path->key("Name");
-        const cimom::Scalar* const scalar = name == nullptr ? nullptr : name->scalar();
-        const auto* const text = scalar == nullptr ? nullptr : std::get_if<std::string>(scalar);
-        if (text != nullptr) {
-            processors.push_back(*text);
-        }
+        processors.push_back(heldText(path->key("Name")));
     }
     return {interfacesOf(served.settings ? *served.settings : nothing,
                          endpoints ? *endpoints : nothing, processors),
@@ -334,8 +331,8 @@ std::optional<std::string> RemoteClient::dataDir() const {
     return std::nullopt;
 }
 
-Failure RemoteClient::failure(const Answer& answer, const cimom::ObjectPath& asked) const {
-    return {ExitStatus::notDone, statusMessage(answer, asked)};
+Failure RemoteClient::failure(const Response& response, const cimom::ObjectPath& asked) const {
+    return {ExitStatus::notDone, statusMessage(response, asked)};
 }
 
 }  // namespace cimdhcp

@@ -11,8 +11,8 @@
 
 namespace cimdhcp {
 
-/// A WBEM server, asked with CIM-XML over HTTP (DSP0200, DSP0201). A server that cannot
-/// be asked, or whose answer cannot be understood, is a Failure with
+/// A WBEM server, reached with CIM-XML over HTTP (DSP0200, DSP0201). A server that cannot
+/// be reached, or whose response cannot be understood, is a Failure with
 /// ExitStatus::notLoaded, which does not name the server.
 class RemoteClient : public Client {
   public:
@@ -21,38 +21,37 @@ class RemoteClient : public Client {
 
     /// Each class is asked for once, when it is first needed.
     [[nodiscard]] ClassLookup classes() override;
-    /// The classes that no other class derives from, without those of the standard's own
-    /// schema: an implementation serves classes with a name of its own. Which provider
-    /// serves them is not known.
+    /// The classes without subclasses, other than those of the standard's own schema: an
+    /// implementation serves classes with names of its own. Their providers are not known.
     [[nodiscard]] std::vector<ClassEntry> servedClasses() override;
-    /// Always true: only the answer tells.
+    /// Always true: only a response tells.
     [[nodiscard]] bool mayServe(std::string_view className) const override;
     /// What the interfaces' settings and IP endpoints tell.
     [[nodiscard]] MachineInterfaces interfaces(const ServedInstances& served) override;
     [[nodiscard]] std::optional<std::string> dataDir() const override;
 
-    Answer enumerateNames(const cimom::ObjectPath& path) override;
-    Answer enumerate(const cimom::ObjectPath& path) override;
-    Answer get(const cimom::ObjectPath& path) override;
-    Answer modify(const cimom::Instance& instance) override;
-    Answer associatorNames(const cimom::ObjectPath& path,
-                           const cimom::AssociationRequest& request) override;
-    Answer associators(const cimom::ObjectPath& path,
-                       const cimom::AssociationRequest& request) override;
-    Answer referenceNames(const cimom::ObjectPath& path,
-                          const cimom::AssociationRequest& request) override;
-    Answer references(const cimom::ObjectPath& path,
-                      const cimom::AssociationRequest& request) override;
+    Response enumerateNames(const cimom::ObjectPath& path) override;
+    Response enumerate(const cimom::ObjectPath& path) override;
+    Response get(const cimom::ObjectPath& path) override;
+    Response modify(const cimom::Instance& instance) override;
+    Response associatorNames(const cimom::ObjectPath& path,
+                             const cimom::AssociationRequest& request) override;
+    Response associators(const cimom::ObjectPath& path,
+                         const cimom::AssociationRequest& request) override;
+    Response referenceNames(const cimom::ObjectPath& path,
+                            const cimom::AssociationRequest& request) override;
+    Response references(const cimom::ObjectPath& path,
+                        const cimom::AssociationRequest& request) override;
 
-    [[nodiscard]] Failure failure(const Answer& answer,
+    [[nodiscard]] Failure failure(const Response& response,
                                   const cimom::ObjectPath& asked) const override;
 
   private:
     cimom::wbem::OperationResponse ask(const cimom::wbem::OperationRequest& request);
     template <typename Read>
-    Answer answerTo(const cimom::wbem::OperationRequest& request, const Read& read);
-    Answer pathsOf(const cimom::wbem::OperationRequest& request);
-    Answer instancesOf(const cimom::wbem::OperationRequest& request);
+    Response responseTo(const cimom::wbem::OperationRequest& request, const Read& read);
+    Response pathsOf(const cimom::wbem::OperationRequest& request);
+    Response instancesOf(const cimom::wbem::OperationRequest& request);
     const cimom::ClassDeclaration* findClass(std::string_view className);
 
     HttpConnection connection_;

@@ -12,8 +12,8 @@
 #include <system_error>
 
 #include "cimom/Cim.h"
-#include "client/Failure.h"
 #include "text/DisplayText.h"
+#include "text/Failure.h"
 #include "zrcommon/File.h"
 
 namespace cimdhcp {
@@ -85,7 +85,7 @@ std::string takeName(std::string_view& rest, const std::string& text) {
     const auto* const end = std::find_if_not(rest.begin(), rest.end(), isHostCharacter);
     const auto length = static_cast<std::size_t>(end - rest.begin());
     if (length == 0 || rest.front() == '-') {
-        refuse(text, "there is no host in it; it is to be of the form https://HOST[:PORT]");
+        refuse(text, "there is no host in it; the form is https://HOST[:PORT]");
     }
     std::string name(rest.substr(0, length));
     rest.remove_prefix(length);
@@ -132,7 +132,7 @@ ServerUrl readServerUrl(const std::string& text) {
     if (rest.substr(0, rest.find('/', authority)).find('@') != std::string_view::npos) {
         // What is refused is not repeated: it holds a password.
         throw Failure(ExitStatus::usage,
-                      "a URL cannot hold a user and a password: everybody on this machine could "
+                      "a URL cannot hold a user and a password: any user of this machine could "
                       "read them in the list of processes; put them into a file for --credentials");
     }
     url.encrypted = takeScheme(rest, text);
@@ -146,7 +146,7 @@ ServerUrl readServerUrl(const std::string& text) {
         return c > ' ' && c < 0x7F && c != '?' && c != '#' && c != '"' && c != '<' && c != '>';
     });
     if (!good || !path) {
-        refuse(text, "it is to be of the form https://HOST[:PORT][/PATH]");
+        refuse(text, "the form is https://HOST[:PORT][/PATH]");
     }
     url.path = rest.size() > 1 ? std::string(rest) : "/cimom";
     return url;

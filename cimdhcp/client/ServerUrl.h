@@ -17,7 +17,7 @@ struct ServerUrl {
 
     /// "https://host:5989/cimom"
     [[nodiscard]] std::string text() const;
-    /// Whether it is on this machine, so that nobody can listen on the way.
+    /// Whether it is on this machine, where no one can listen on the way.
     [[nodiscard]] bool isHere() const;
 
     bool operator==(const ServerUrl&) const = default;

@@ -8,10 +8,10 @@ namespace cimdhcp {
 
 namespace {
 
-/// What a status means for the path, when nobody said it in words.
-std::string explanation(const Answer& answer, const cimom::ObjectPath& asked) {
-    const std::string operation = answer.operation + " of " + asked.className;
-    switch (answer.status.code) {
+/// What a status means for the path, when the response has no words of its own.
+std::string explanation(const Response& response, const cimom::ObjectPath& asked) {
+    const std::string operation = response.operation + " of " + asked.className;
+    switch (response.status.code) {
         case CMPI_RC_ERR_ACCESS_DENIED:
             return operation + " is not allowed";
         case CMPI_RC_ERR_INVALID_NAMESPACE:
@@ -27,8 +27,8 @@ std::string explanation(const Answer& answer, const cimom::ObjectPath& asked) {
     }
 }
 
-std::string remedy(const Answer& answer, const cimom::ObjectPath& asked) {
-    switch (answer.status.code) {
+std::string remedy(const Response& response, const cimom::ObjectPath& asked) {
+    switch (response.status.code) {
         case CMPI_RC_ERR_INVALID_CLASS:
             return "; \"cimdhcp classes\" lists what is";
         case CMPI_RC_ERR_NOT_FOUND:
@@ -45,10 +45,11 @@ std::string_view statusNameOf(const cimom::Status& status) noexcept {
                        : cimom::wbem::cimStatusName(static_cast<unsigned>(status.code));
 }
 
-std::string statusMessage(const Answer& answer, const cimom::ObjectPath& asked) {
-    const std::string& words = answer.status.message;
-    return std::string(statusNameOf(answer.status)) + ": " +
-           printable(words.empty() ? explanation(answer, asked) : words) + remedy(answer, asked);
+std::string statusMessage(const Response& response, const cimom::ObjectPath& asked) {
+    const std::string& words = response.status.message;
+    return std::string(statusNameOf(response.status)) + ": " +
+           printable(words.empty() ? explanation(response, asked) : words) +
+           remedy(response, asked);
 }
 
 }  // namespace cimdhcp

@@ -11,12 +11,14 @@
 #include <utility>
 #include <variant>
 
-#include "arguments/PlatformSetup.h"
+#include "arguments/Directories.h"
 #include "client/EmbeddedClient.h"
-#include "client/Failure.h"
 #include "commands/HiddenClients.h"
+#include "commands/PlatformSetup.h"
 #include "text/DisplayText.h"
+#include "text/Failure.h"
 #include "zrclient/InstrumentationService.h"
+#include "zrcommon/InterfaceFile.h"
 #include "zrcommon/PlatformSettings.h"
 
 namespace cimdhcp {
@@ -54,7 +56,7 @@ class Examination {
         findings_.push_back({verdict, std::move(what), std::move(detail), std::move(remedy)});
     }
 
-    /// False when the tree cannot be read: there is no machine to look at then.
+    /// False when the tree cannot be read, so that there is no machine to examine.
     bool lookAtSettings() {
         std::ostringstream warnings;
         std::optional<Failure> failure;
@@ -66,8 +68,8 @@ class Examination {
         const ZR::PlatformSettings& settings = ZR::PlatformSettings::process();
         const char* const named = std::getenv("ZR_CONFIG");
         const std::string file = named == nullptr ? "/etc/zr/platform.conf" : named;
-        for (const std::string& complaint : settings.complaints) {
-            add(Verdict::bad, "settings", printable(complaint),
+        for (const std::string& diagnostic : settings.complaints) {
+            add(Verdict::bad, "settings", printable(diagnostic),
                 "correct it; docs/settings.md lists the settings");
         }
         if (settings.complaints.empty()) {
@@ -96,7 +98,7 @@ class Examination {
         std::size_t files = 0;
         for (fs::directory_iterator entry(directory, error); !error && entry != end(entry);
              entry.increment(error)) {
-            if (entry->path().filename().string().starts_with("ifcfg-")) {
+            if (entry->path().filename().string().starts_with(ZR::InterfaceFile::prefix)) {
                 ++files;
             }
         }
@@ -294,16 +296,17 @@ class Examination {
             if (!registration.instance || registration.nameSpaces.empty()) {
                 continue;
             }
-            const Answer answer = client_->enumerate(pathOf(registration));
-            if (!answer.status.ok()) {
+            const Response response = client_->enumerate(pathOf(registration));
+            if (!response.status.ok()) {
                 add(Verdict::bad, registration.className,
-                    std::string(cimom::statusName(answer.status.code)) +
-                        (answer.status.message.empty() ? ""
-                                                       : ": " + printable(answer.status.message)),
+                    std::string(cimom::statusName(response.status.code)) +
+                        (response.status.message.empty()
+                             ? ""
+                             : ": " + printable(response.status.message)),
                     "every step is in the log with ZR_LOG_SINK=stderr ZR_LOG_LEVEL=3000 cimdhcp "
                     "instances " +
                         registration.className);
-            } else if (answer.instances.empty()) {
+            } else if (response.instances.empty()) {
                 add(Verdict::notable, registration.className, "no instance",
                     dhcpInterfaces_ == 0 ? "see \"machine\" above"
                                          : "nothing of this kind is on the machine now; the log "
@@ -311,7 +314,7 @@ class Examination {
                                            "ZR_LOG_LEVEL=3000");
             } else {
                 add(Verdict::good, registration.className,
-                    counted(answer.instances.size(), "instance", "instances"));
+                    counted(response.instances.size(), "instance", "instances"));
             }
         }
     }

@@ -1,21 +1,18 @@
 #include "commands/ClientCommands.h"
 
-#include <nlohmann/json.hpp>
+#include <cstdint>
 #include <type_traits>
 #include <utility>
-#include <variant>
 
-#include "client/ClassList.h"
-#include "commands/CimCommands.h"
+#include "commands/CimOperations.h"
+#include "commands/ClassTable.h"
 #include "commands/Graph.h"
 #include "commands/GraphDrawing.h"
-#include "commands/MachineOverview.h"
 #include "commands/Overview.h"
 #include "commands/Rename.h"
-#include "text/AnswerOrder.h"
-#include "text/JsonFormat.h"
-#include "text/MofFormat.h"
-#include "text/TableFormat.h"
+#include "commands/ResponseOrder.h"
+#include "commands/ResponseText.h"
+#include "text/JsonText.h"
 
 namespace cimdhcp {
 
@@ -57,13 +54,13 @@ class Execution {
         if constexpr (isOneOf<Kind, TreeCommand, ServeCommand, UserAddCommand, CheckCommand>) {
             throw Failure(ExitStatus::usage, "this command is about this machine alone");
         } else {
-            Request request = cimdhcp::carryOut(command, client_);
+            CimOperation operation = cimdhcp::carryOut(command, client_);
             if (presentation_.sort) {
-                sortAnswer(*presentation_.sort, request.answer);
+                sortResponse(*presentation_.sort, operation.response);
             }
-            Outcome outcome{formatted(request.answer), "", std::nullopt};
-            if (!request.answer.status.ok()) {
-                outcome.failure = client_.failure(request.answer, request.asked);
+            Outcome outcome{formatted(operation.response), "", std::nullopt};
+            if (!operation.response.status.ok()) {
+                outcome.failure = client_.failure(operation.response, operation.path);
             } else if (std::is_same_v<Kind, ModifyCommand> &&
                        presentation_.format == Format::table) {
                 outcome.text += "Modified.\n";
@@ -89,22 +86,23 @@ class Execution {
     }
 
     [[nodiscard]] std::string counted(std::size_t number) const {
-        return presentation_.json() ? jsonText({{"count", number}}) : std::to_string(number) + '\n';
+        return presentation_.json() ? jsonText(JsonMembers{{"count", std::uint64_t{number}}})
+                                    : std::to_string(number) + '\n';
     }
 
-    [[nodiscard]] std::string formatted(const Answer& answer) const {
-        if (presentation_.count && answer.status.ok()) {
-            return counted(answer.paths.size() + answer.instances.size());
+    [[nodiscard]] std::string formatted(const Response& response) const {
+        if (presentation_.count && response.status.ok()) {
+            return counted(response.paths.size() + response.instances.size());
         }
         switch (presentation_.format) {
             case Format::json:
-                return asJson(answer);
+                return asJson(response);
             case Format::mof:
-                return asMof(answer, client_.classes());
+                return asMof(response, client_.classes());
             case Format::table:
                 break;
         }
-        return asTable(answer, client_.classes(), presentation_.width, presentation_.style);
+        return asTable(response, client_.classes(), presentation_.width, presentation_.style);
     }
 
     Client& client_;
@@ -112,20 +110,6 @@ class Execution {
 };
 
 }  // namespace
-
-bool asksClient(const Command& command) noexcept {
-    return !std::holds_alternative<TreeCommand>(command) &&
-           !std::holds_alternative<ServeCommand>(command) &&
-           !std::holds_alternative<UserAddCommand>(command) &&
-           !std::holds_alternative<CheckCommand>(command);
-}
-
-bool answersList(const Command& command) noexcept {
-    return asksClient(command) && !std::holds_alternative<RenameCommand>(command) &&
-           !std::holds_alternative<GraphCommand>(command) &&
-           !std::holds_alternative<GetCommand>(command) &&
-           !std::holds_alternative<ModifyCommand>(command);
-}
 
 Outcome carryOut(const Command& command, Client& client, const Presentation& presentation) {
     return std::visit(Execution(client, presentation), command);

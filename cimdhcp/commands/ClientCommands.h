@@ -5,23 +5,17 @@
 
 #include "arguments/CommandLine.h"
 #include "client/Client.h"
-#include "client/Failure.h"
+#include "text/Failure.h"
 #include "text/Presentation.h"
 
 namespace cimdhcp {
 
-/// What came of a command.
+/// The outcome of a command.
 struct Outcome {
     std::string text;                ///< for standard output
     std::string remarks;             ///< for standard error
     std::optional<Failure> failure;  ///< what ends the program when both are written
 };
-
-/// Whether the command asks an object manager, and so can be asked of another machine.
-[[nodiscard]] bool asksClient(const Command& command) noexcept;
-
-/// Whether the command answers a list, which can be sorted and counted.
-[[nodiscard]] bool answersList(const Command& command) noexcept;
 
 /// Carries out a command that asks an object manager. Throws Failure.
 [[nodiscard]] Outcome carryOut(const Command& command, Client& client,

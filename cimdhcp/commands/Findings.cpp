@@ -1,9 +1,9 @@
 #include "commands/Findings.h"
 
 #include <algorithm>
-#include <nlohmann/json.hpp>
+#include <utility>
 
-#include "text/JsonFormat.h"
+#include "text/JsonText.h"
 
 namespace cimdhcp {
 
@@ -65,14 +65,14 @@ std::string findingsText(const std::vector<Finding>& findings) {
 }
 
 std::string findingsJson(const std::vector<Finding>& findings) {
-    auto list = nlohmann::ordered_json::array();
+    JsonList list;
     for (const Finding& finding : findings) {
-        list.push_back({{"verdict", nameOf(finding.verdict)},
-                        {"what", finding.what},
-                        {"detail", finding.detail},
-                        {"remedy", finding.remedy}});
+        list.push_back(JsonMembers{{"verdict", nameOf(finding.verdict)},
+                                   {"what", finding.what},
+                                   {"detail", finding.detail},
+                                   {"remedy", finding.remedy}});
     }
-    return jsonText({{"findings", std::move(list)}});
+    return jsonText(JsonMembers{{"findings", std::move(list)}});
 }
 
 bool isGood(const std::vector<Finding>& findings) noexcept {

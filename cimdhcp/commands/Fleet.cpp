@@ -34,7 +34,7 @@ class Reports {
         changed_.notify_one();
     }
 
-    /// Nothing when all are through.
+    /// None when all askers have ended.
     std::optional<ServerReport> take() {
         std::unique_lock lock(mutex_);
         changed_.wait(lock, [this] { return !waiting_.empty() || askers_ == 0; });

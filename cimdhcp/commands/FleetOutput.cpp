@@ -1,18 +1,17 @@
 #include "commands/FleetOutput.h"
 
 #include <algorithm>
-#include <nlohmann/json.hpp>
+#include <cstdint>
 #include <ostream>
 #include <sstream>
 
 #include "text/DisplayText.h"
 #include "text/Duration.h"
+#include "text/JsonText.h"
 
 namespace cimdhcp {
 
 namespace {
-
-using Json = nlohmann::ordered_json;
 
 /// The text with something at the beginning of each line.
 std::string prefixed(const std::string& text, const std::string& prefix) {
@@ -59,15 +58,17 @@ std::string FleetOutput::textOf(const ServerReport& report) const {
 
 std::string FleetOutput::jsonOf(const ServerReport& report) const {
     const auto& failure = report.outcome.failure;
-    Json status{{"exit", failure ? static_cast<int>(failure->status()) : 0},
-                {"message", failure ? Json(failure->what()) : Json(nullptr)}};
-    Json object{{"host", servers_[report.server].given}, {"status", std::move(status)}};
+    const ExitStatus exit = failure ? failure->status() : ExitStatus::ok;
+    JsonMembers object{
+        {"host", servers_[report.server].given},
+        {"status", JsonMembers{{"exit", std::int64_t{static_cast<int>(exit)}},
+                               {"message", failure ? Json(failure->what()) : Json(nullptr)}}}};
     if (showTime_) {
-        object["seconds"] = report.took.count();
+        object.emplace_back("seconds", report.took.count());
     }
-    object["result"] =
-        report.outcome.text.empty() ? Json(nullptr) : Json::parse(report.outcome.text);
-    return object.dump(-1, ' ', false, Json::error_handler_t::replace) + '\n';
+    const std::string& result = report.outcome.text;
+    object.emplace_back("result", result.empty() ? Json(nullptr) : Json(JsonDocument{result}));
+    return jsonLine(object);
 }
 
 void FleetOutput::show(ServerReport&& report) {

@@ -13,7 +13,7 @@
 
 namespace cimdhcp {
 
-/// Shows what several servers answered, each as soon as it is there.
+/// Shows the results of several servers, each as soon as it is there.
 ///
 /// Tables stand below a heading with the server's name, MOF and graphs below a comment
 /// with it; without headings, and with numbers alone, the name stands at the beginning
@@ -28,8 +28,8 @@ class FleetOutput {
 
     void show(ServerReport&& report);
 
-    /// Lists the failures. Answers how the program ends: all servers that have not
-    /// reported were not asked.
+    /// Lists the failures, and returns how the program ends. Servers that have not
+    /// reported count as not asked.
     ExitStatus finish(bool interrupted);
 
   private:

@@ -7,14 +7,14 @@
 #include <string_view>
 #include <utility>
 
-#include "client/ClassList.h"
 #include "text/DisplayText.h"
+#include "text/ValueMeaning.h"
 
 namespace cimdhcp {
 
 namespace {
 
-/// What every served class name begins with: no news in a picture.
+/// The beginning of every served class name, which a picture leaves out.
 constexpr std::string_view schemaPrefix = "QVXZR_";
 
 /// The references from which an arrow goes out.
@@ -68,8 +68,8 @@ std::string_view shortName(std::string_view className) {
     return className.starts_with(schemaPrefix) ? className.substr(schemaPrefix.size()) : className;
 }
 
-/// A text as it stands between double quotes in Graphviz' language. Labels know
-/// escapes of their own behind a backslash, which must not come from a name.
+/// A text as it stands between double quotes in Graphviz' language, whose labels have
+/// escapes of their own: a backslash in a name must not begin one.
 std::string escaped(std::string_view text) {
     std::string result;
     for (const char letter : printable(text)) {
@@ -81,21 +81,18 @@ std::string escaped(std::string_view text) {
     return result;
 }
 
-/// What tells the instance from the others of its class.
+/// The key that distinguishes the instance from the others of its class.
 std::string identity(const cimom::ObjectPath& path) {
     for (const std::string_view name : {"InstanceID", "Name"}) {
-        const cimom::Value* const value = path.key(name);
-        const cimom::Scalar* const scalar = value == nullptr ? nullptr : value->scalar();
-        const auto* const text = scalar == nullptr ? nullptr : std::get_if<std::string>(scalar);
-        if (text != nullptr) {
-            return *text;
+        if (std::string text = heldText(path.key(name)); !text.empty()) {
+            return text;
         }
     }
     return {};
 }
 
 std::string label(const cimom::ObjectPath& path) {
-    // The line break is Graphviz' own escape, hence behind the escaping.
+    // "\\n" is an escape of Graphviz, and so is added after the escaping.
     return '"' + escaped(identity(path)) + "\\n" + escaped(shortName(path.className)) + '"';
 }
 
@@ -105,21 +102,6 @@ std::string_view fillOf(const std::string& className) {
             return className.find(each.classPart) != std::string::npos;
         });
     return fill == fills.end() ? "#ffffff" : fill->color;
-}
-
-std::vector<cimom::ObjectPath> pathsOf(Client& client, const std::string& className) {
-    const cimom::ObjectPath asked = client.classPath(className);
-    Answer answer = client.enumerateNames(asked);
-    if (!answer.status.ok()) {
-        throw client.failure(answer, asked);
-    }
-    std::vector<cimom::ObjectPath> paths;
-    for (std::optional<cimom::ObjectPath>& path : answer.paths) {
-        if (path) {
-            paths.push_back(std::move(*path));
-        }
-    }
-    return paths;
 }
 
 }  // namespace
@@ -149,7 +131,7 @@ Graph graphOfMachine(Client& client) {
     std::vector<cimom::ObjectPath> associations;
     for (const ClassEntry& entry : client.servedClasses()) {
         std::vector<cimom::ObjectPath>& paths = entry.association ? associations : elements;
-        for (cimom::ObjectPath& path : pathsOf(client, entry.name)) {
+        for (cimom::ObjectPath& path : client.pathsIn(entry.name)) {
             paths.push_back(std::move(path));
         }
     }

@@ -41,7 +41,7 @@ struct Graph {
 [[nodiscard]] Graph connect(const std::vector<cimom::ObjectPath>& elements,
                             const std::vector<cimom::ObjectPath>& associations);
 
-/// All that the providers serve. Throws Failure for any answer that is not OK.
+/// All that the providers serve. Throws Failure for any response that is not OK.
 [[nodiscard]] Graph graphOfMachine(Client& client);
 
 /// The graph in the language of Graphviz, with everything that steers the drawing.

@@ -10,7 +10,7 @@
 #include <string_view>
 #include <system_error>
 
-#include "client/Failure.h"
+#include "text/Failure.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace cimdhcp {

@@ -15,8 +15,8 @@ namespace {
 
 namespace fs = std::filesystem;
 
-/// Programs whose processes the live source looks for; without what they do where,
-/// nothing is known of their links.
+/// Programs whose processes the live source looks for. Their links are known from these
+/// processes alone.
 constexpr std::array<std::string_view, 6> clients{"dhclient", "dhcpcd",  "udhcpc",
                                                   "udhcpc6",  "busybox", "dhcp6c"};
 
@@ -25,7 +25,7 @@ bool isProcess(const std::string& name) {
                        [](unsigned char letter) { return std::isdigit(letter) != 0; });
 }
 
-/// Whether another namespace than the reader's could be told from the reader's own.
+/// Whether this user may read which network namespace the process is in.
 bool canTellNamespace(const fs::path& process) {
     std::error_code error;
     static_cast<void>(fs::read_symlink(process / "ns" / "net", error));
@@ -43,7 +43,7 @@ HiddenClients findHiddenClients(const fs::path& proc) {
     if (error) {
         return hidden;
     }
-    // The first process of all runs as root, and can be seen by everybody otherwise.
+    // Process 1 runs as root; without hidepid every user can see it.
     hidden.otherUsersHidden =
         ::geteuid() != 0 && ::access((proc / "1" / "comm").c_str(), F_OK) != 0;
     for (; !error && entry != end(entry); entry.increment(error)) {

@@ -6,18 +6,18 @@
 
 namespace cimdhcp {
 
-/// What this process may not learn of DHCP clients that run.
+/// Running DHCP clients that this process may not look into.
 struct HiddenClients {
-    /// "dhclient (process 123)" for each whose network namespace cannot be told:
-    /// what it does is left out of the machine.
+    /// "dhclient (process 123)" for each whose network namespace cannot be read. The
+    /// live source leaves out what such a client does.
     std::vector<std::string> processes;
-    /// /proc shows nobody else's processes (its mount option hidepid).
+    /// /proc hides the processes of other users (its mount option hidepid).
     bool otherUsersHidden = false;
 
     bool operator==(const HiddenClients&) const = default;
 };
 
-/// Looks through a directory like /proc. What cannot be read at all is not hidden.
+/// Looks through a directory like /proc. In one that cannot be read, none are hidden.
 [[nodiscard]] HiddenClients findHiddenClients(const std::filesystem::path& proc = "/proc");
 
 }  // namespace cimdhcp

@@ -5,8 +5,8 @@
 
 namespace cimdhcp {
 
-/// While it lives, the first SIGINT or SIGTERM is a wish to end, which can be asked
-/// for; a second one ends the process. There is one at a time.
+/// While it exists, the first SIGINT or SIGTERM only sets wanted(), and the second one
+/// ends the process. At most one exists at a time.
 class Interruption {
   public:
     Interruption();

@@ -1,18 +1,14 @@
 #include "commands/Overview.h"
 
 #include <algorithm>
-#include <nlohmann/json.hpp>
+#include <utility>
 
 #include "text/DisplayText.h"
-#include "text/JsonFormat.h"
+#include "text/JsonText.h"
 
 namespace cimdhcp {
 
 namespace {
-
-std::string cell(const std::string& text) {
-    return text.empty() ? "-" : text;
-}
 
 std::string cell(std::optional<bool> on) {
     if (!on) {
@@ -24,27 +20,29 @@ std::string cell(std::optional<bool> on) {
 std::string cell(const std::vector<std::string>& texts) {
     std::string joined;
     for (const std::string& text : texts) {
-        joined += (joined.empty() ? "" : ", ") + cell(text);
+        joined += (joined.empty() ? "" : ", ") + cellOf(text);
     }
-    return cell(joined);
-}
-
-nlohmann::ordered_json json(const std::string& text) {
-    return text.empty() ? nlohmann::ordered_json(nullptr) : nlohmann::ordered_json(text);
+    return cellOf(joined);
 }
 
 }  // namespace
+
+ServedInstances askProvider(Client& client) {
+    return {client.instancesIn("QVXZR_DHCPProtocolEndpoint"),
+            client.instancesIn("QVXZR_DHCPRemoteServiceAccessPoint"),
+            client.instancesIn("QVXZR_DHCPSettingData")};
+}
 
 const std::vector<Column<InterfaceOverview>>& overviewColumns() {
     using Row = InterfaceOverview;
     static const std::vector<Column<Row>> columns{
         {"SYSTEM", [](const Row& row) { return row.system; }},
-        {"INTERFACE", [](const Row& row) { return cell(row.name); }},
+        {"INTERFACE", [](const Row& row) { return cellOf(row.name); }},
         {"DHCP", [](const Row& row) { return cell(row.dhcp); }},
-        {"STATE", [](const Row& row) { return cell(row.state); }},
-        {"ADDRESS", [](const Row& row) { return cell(row.address); }},
+        {"STATE", [](const Row& row) { return cellOf(row.state); }},
+        {"ADDRESS", [](const Row& row) { return cellOf(row.address); }},
         {"SERVERS", [](const Row& row) { return cell(row.servers); }},
-        {"CONFIGURATION NAME", [](const Row& row) { return cell(row.configurationName); }}};
+        {"CONFIGURATION NAME", [](const Row& row) { return cellOf(row.configurationName); }}};
     return columns;
 }
 
@@ -55,7 +53,7 @@ std::string overviewTable(const std::vector<InterfaceOverview>& interfaces,
     }
     const bool oneSystem =
         std::all_of(interfaces.begin(), interfaces.end(),
-                    [](const InterfaceOverview& each) { return each.system == "Computer"; });
+                    [](const InterfaceOverview& each) { return each.system == hostSystem; });
     auto columns = overviewColumns();
     if (oneSystem) {
         columns.erase(columns.begin());
@@ -77,27 +75,24 @@ std::string remarkLine(std::span<const std::string> remarks) {
         line += (&remark == &remarks.front() ? "" : "; ") + printable(remark);
     }
     if (remarks.size() > mostTold) {
-        line += "; and " + std::to_string(remarks.size() - mostTold) + " more, told in the log";
+        line +=
+            "; and " + std::to_string(remarks.size() - mostTold) + " more, which are in the log";
     }
     return line + '\n';
 }
 
 std::string overviewJson(const std::vector<InterfaceOverview>& interfaces) {
-    auto list = nlohmann::ordered_json::array();
+    JsonList list;
     for (const InterfaceOverview& each : interfaces) {
-        nlohmann::ordered_json dhcp;
-        if (each.dhcp) {
-            dhcp = *each.dhcp;
-        }
-        list.push_back({{"interface", each.name},
-                        {"system", each.system},
-                        {"dhcp", std::move(dhcp)},
-                        {"state", json(each.state)},
-                        {"address", json(each.address)},
-                        {"servers", each.servers},
-                        {"configurationName", json(each.configurationName)}});
+        list.push_back(JsonMembers{{"interface", each.name},
+                                   {"system", each.system},
+                                   {"dhcp", each.dhcp ? Json(*each.dhcp) : Json(nullptr)},
+                                   {"state", textOrNull(each.state)},
+                                   {"address", textOrNull(each.address)},
+                                   {"servers", JsonList(each.servers.begin(), each.servers.end())},
+                                   {"configurationName", textOrNull(each.configurationName)}});
     }
-    return jsonText({{"interfaces", std::move(list)}});
+    return jsonText(JsonMembers{{"interfaces", std::move(list)}});
 }
 
 }  // namespace cimdhcp

@@ -6,11 +6,15 @@
 #include <string>
 #include <vector>
 
-#include "commands/MachineOverview.h"
+#include "client/Client.h"
 #include "text/Columns.h"
 #include "text/Style.h"
 
 namespace cimdhcp {
+
+/// Asks the provider for what it serves. Throws Failure for any response that is neither
+/// OK nor says that the class is not served.
+[[nodiscard]] ServedInstances askProvider(Client& client);
 
 /// The interfaces as a table, with a line below it when none of them uses DHCP;
 /// that line alone when there are none. The system stands in a column of its own

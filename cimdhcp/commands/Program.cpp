@@ -9,15 +9,16 @@
 
 #include "arguments/CommandLine.h"
 #include "arguments/Directories.h"
-#include "arguments/PlatformSetup.h"
 #include "client/EmbeddedClient.h"
-#include "client/Failure.h"
+#include "client/Installation.h"
 #include "commands/Check.h"
 #include "commands/ClientCommands.h"
+#include "commands/PlatformSetup.h"
 #include "commands/RemoteRun.h"
 #include "commands/Serve.h"
 #include "commands/UserAdd.h"
 #include "text/Duration.h"
+#include "text/Failure.h"
 #include "text/Presentation.h"
 #include "zrclient/InstrumentationService.h"
 #include "zrclient/SnapshotJson.h"
@@ -31,9 +32,10 @@ namespace {
 /// How long the service processor may take.
 constexpr std::chrono::seconds patience(1);
 
-/// The service processor answers when it likes, and no request waits for it. This
-/// program ends after one request: the provider is made to ask, then a question is
-/// asked behind its own, and the answer to that one awaited.
+/// No request of the provider waits for the service processor, whose response comes later.
+/// This program ends after one request, and so waits: a first request makes the provider
+/// send its own to the service processor; a further one is sent after it, and its response
+/// awaited, which comes after the response to the provider.
 void awaitServiceProcessor(Client& client) {
     if (!ZR::InstrumentationService::process().awaiting()) {
         return;
@@ -60,7 +62,7 @@ class Execution {
         if (command.explain) {
             if (!ZR::PlatformSettings::process().instrumentationTree.empty()) {
                 throw Failure(ExitStatus::usage,
-                              "only of the live machine it is known where properties came from");
+                              "the sources of properties are known for the live machine alone");
             }
             service.useSource(ZR::openLiveSource(ZR::Explain::Yes));
         }
@@ -77,7 +79,7 @@ class Execution {
         const auto findings = check(line_.options, installations(executableFile()));
         outputs_.out << (presentation_.json() ? findingsJson(findings) : findingsText(findings));
         if (!isGood(findings)) {
-            throw Failure(ExitStatus::notDone, "something is wrong, as the list tells");
+            throw Failure(ExitStatus::notDone, "something is wrong; see the list");
         }
     }
 
@@ -125,8 +127,8 @@ ExitStatus runLine(const CommandLine& line, const Outputs& outputs, const Style&
     if (line.options.remote()) {
         return runRemotely(line, presentation, outputs, errorStyle);
     }
-    // Who may use the server has nothing to do with the machine; the check does this
-    // itself, and goes on when it fails.
+    // A user is added without a look at the machine; the check sets the platform up itself,
+    // and goes on when that fails.
     if (!std::holds_alternative<UserAddCommand>(line.command) &&
         !std::holds_alternative<CheckCommand>(line.command)) {
         setUpPlatform(line.options, outputs.err);
@@ -140,7 +142,7 @@ ExitStatus runLine(const CommandLine& line, const Outputs& outputs, const Style&
 int run(const std::vector<std::string>& arguments, const Outputs& outputs) noexcept {
     ExitStatus status = ExitStatus::ok;
     Style errorStyle;
-    const auto complain = [&](ExitStatus reason, const char* message) {
+    const auto fail = [&](ExitStatus reason, const char* message) {
         status = reason;
         outputs.err << errorStyle.alarming("cimdhcp:") << ' ' << message << '\n';
     };
@@ -158,13 +160,13 @@ int run(const std::vector<std::string>& arguments, const Outputs& outputs) noexc
             status = runLine(line, outputs, errorStyle);
         }
     } catch (const Failure& failure) {
-        complain(failure.status(), failure.what());
+        fail(failure.status(), failure.what());
     } catch (const std::exception& exception) {
-        complain(ExitStatus::notLoaded, exception.what());
+        fail(ExitStatus::notLoaded, exception.what());
     }
-    // What has been printed before a failure is to come out, too.
+    // What was printed before a failure comes out, too.
     if (!outputs.out.flush() && status == ExitStatus::ok) {
-        complain(ExitStatus::notLoaded, "the output cannot be written");
+        fail(ExitStatus::notLoaded, "the output cannot be written");
     }
     if (time) {
         outputs.err << "cimdhcp: it took " << durationText(std::chrono::steady_clock::now() - start)

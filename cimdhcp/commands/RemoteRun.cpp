@@ -18,7 +18,7 @@ namespace cimdhcp {
 
 namespace {
 
-/// Asks servers as the options want it. Safe for concurrent use.
+/// Carries the command out on servers, as the options say. Safe for concurrent use.
 class Asker {
   public:
     Asker(const CommandLine& line, const Presentation& presentation,
@@ -55,7 +55,7 @@ class Asker {
             if (!server.encrypted && !server.isHere() && !settings.insecure) {
                 throw Failure(ExitStatus::notLoaded,
                               "the password could be read on the way over http; use https, or "
-                              "--insecure if nobody listens");
+                              "--insecure if no one can listen");
             }
             settings.credential = *credential;
         }
@@ -92,8 +92,8 @@ ExitStatus runRemotely(const CommandLine& line, const Presentation& presentation
         throw Failure(ExitStatus::usage, "--svg draws one machine; ask one server at a time");
     }
     if (line.options.insecure) {
-        outputs.err << "cimdhcp: warning: --insecure: nobody vouches that the servers are who "
-                       "they say, and passwords may be sent unencrypted\n";
+        outputs.err << "cimdhcp: warning: --insecure: the identity of the servers is not checked, "
+                       "and passwords may be sent unencrypted\n";
     }
     const Interruption interruption;
     const Asker ask(line, presentation, interruption.wanted());
@@ -102,10 +102,10 @@ ExitStatus runRemotely(const CommandLine& line, const Presentation& presentation
         try {
             outcome = ask(servers.front());
         } catch (const Failure& failure) {
-            // What is no answer of the server needs its name.
-            const bool unanswered = failure.status() == ExitStatus::notLoaded;
+            // A failure without a response of the server needs the server's name.
+            const bool noResponse = failure.status() == ExitStatus::notLoaded;
             outcome.failure =
-                unanswered ? Failure(interruption.wanted() ? ExitStatus::interrupted
+                noResponse ? Failure(interruption.wanted() ? ExitStatus::interrupted
                                                            : ExitStatus::notLoaded,
                                      printable(servers.front().given) + ": " + failure.what())
                            : failure;

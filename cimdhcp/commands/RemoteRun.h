@@ -1,15 +1,16 @@
 #pragma once
 
 #include "arguments/CommandLine.h"
-#include "client/Failure.h"
 #include "commands/Program.h"
+#include "text/Failure.h"
 #include "text/Presentation.h"
 
 namespace cimdhcp {
 
 /// Carries out a command on the servers that the options name: on one that --connect
-/// names as on this machine, on several as FleetOutput tells. Answers how the program
-/// ends; throws Failure for what is no server's fault, or the one server's.
+/// names with the output of this machine, on several with that of FleetOutput. Returns how
+/// the program ends. Throws Failure for a fault of the only server, and for what is not
+/// the fault of a server.
 ExitStatus runRemotely(const CommandLine& line, const Presentation& presentation,
                        const Outputs& outputs, const Style& errorStyle);
 

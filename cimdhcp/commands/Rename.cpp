@@ -1,15 +1,15 @@
 #include "commands/Rename.h"
 
-#include <nlohmann/json.hpp>
 #include <utility>
-#include <variant>
 #include <vector>
 
-#include "client/Failure.h"
-#include "commands/ConfigurationFile.h"
+#include "commands/RenameFiles.h"
 #include "text/DisplayText.h"
-#include "text/JsonFormat.h"
+#include "text/Failure.h"
+#include "text/JsonText.h"
+#include "text/ValueMeaning.h"
 #include "zrcommon/File.h"
+#include "zrcommon/InterfaceFile.h"
 #include "zrcommon/Strings.h"
 
 namespace cimdhcp {
@@ -26,29 +26,12 @@ struct Setting {
     std::string interfaceName;  ///< "eth0"
 };
 
-std::string textOf(const cimom::Value* value) {
-    const cimom::Scalar* const scalar = value == nullptr ? nullptr : value->scalar();
-    const auto* const text = scalar == nullptr ? nullptr : std::get_if<std::string>(scalar);
-    return text == nullptr ? std::string() : *text;
-}
-
 std::vector<Setting> settings(Client& client) {
-    const cimom::ObjectPath asked = client.classPath(settingClass);
-    const Answer answer = client.enumerateNames(asked);
-    if (!answer.status.ok()) {
-        throw client.failure(answer, asked);
-    }
     std::vector<Setting> result;
-    for (const auto& path : answer.paths) {
-        if (!path) {
-            continue;
-        }
-        std::string id = textOf(path->key("InstanceID"));
-        // No system's name has the sign, an interface's may.
-        const std::size_t sign = id.find('%');
-        if (sign != std::string::npos) {
-            std::string interfaceName = id.substr(sign + 1);
-            result.push_back({*path, std::move(id), std::move(interfaceName)});
+    for (cimom::ObjectPath& path : client.pathsIn(settingClass)) {
+        std::string text = heldText(path.key("InstanceID"));
+        if (auto id = readInterfaceId(text)) {
+            result.push_back({std::move(path), std::move(text), std::move(id->name)});
         }
     }
     return result;
@@ -87,13 +70,13 @@ Setting find(const std::string& wanted, const std::vector<Setting>& all) {
 }
 
 std::string nameNow(const cimom::ObjectPath& path, Client& client) {
-    const Answer answer = client.get(path);
-    if (!answer.status.ok()) {
-        throw client.failure(answer, path);
+    const Response response = client.get(path);
+    if (!response.status.ok()) {
+        throw client.failure(response, path);
     }
-    for (const auto& instance : answer.instances) {
+    for (const auto& instance : response.instances) {
         if (instance) {
-            return textOf(instance->property(nameProperty));
+            return heldText(instance->property(nameProperty));
         }
     }
     return {};
@@ -114,7 +97,7 @@ void prepareFile(const RenameCommand& command, RenameReport& report) {
 }
 
 std::string fileOf(const Setting& setting, const std::string& dataDir) {
-    auto file = configurationFilePath(dataDir, setting.interfaceName);
+    auto file = ZR::InterfaceFile::path(dataDir, setting.interfaceName);
     if (!file) {
         throw Failure(ExitStatus::notDone, "the name \"" + printable(setting.interfaceName) +
                                                "\" cannot be part of a file's name: such an "
@@ -147,9 +130,9 @@ RenameReport rename(const RenameCommand& command, Client& client) {
 
     const cimom::Instance wanted{setting.path,
                                  {{nameProperty, cimom::Value::ofString(command.name)}}};
-    const Answer answer = client.modify(wanted);
-    if (!answer.status.ok()) {
-        throw client.failure(answer, setting.path);
+    const Response response = client.modify(wanted);
+    if (!response.status.ok()) {
+        throw client.failure(response, setting.path);
     }
     const std::string name = nameNow(setting.path, client);
     if (name != command.name) {
@@ -180,16 +163,13 @@ std::string renameText(const RenameReport& report) {
 }
 
 std::string renameJson(const RenameReport& report) {
-    const auto json = [](const std::string& text) {
-        return text.empty() ? nlohmann::ordered_json(nullptr) : nlohmann::ordered_json(text);
-    };
-    return jsonText({{"operation", "rename"},
-                     {"interface", report.interfaceName},
-                     {"file", json(report.file)},
-                     {"fileCreated", report.fileCreated},
-                     {"directoryCreated", report.directoryCreated},
-                     {"oldName", json(report.oldName)},
-                     {"newName", report.newName}});
+    return jsonText(JsonMembers{{"operation", "rename"},
+                                {"interface", report.interfaceName},
+                                {"file", textOrNull(report.file)},
+                                {"fileCreated", report.fileCreated},
+                                {"directoryCreated", report.directoryCreated},
+                                {"oldName", textOrNull(report.oldName)},
+                                {"newName", report.newName}});
 }
 
 }  // namespace cimdhcp

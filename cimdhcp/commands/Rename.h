@@ -20,16 +20,16 @@ struct RenameReport {
     bool operator==(const RenameReport&) const = default;
 };
 
-/// Changes the configuration name of an interface through the provider, and reads
-/// it back: what it answers has happened. The interface may be given as the setting's
-/// InstanceID ("BMC%eth1"), too, which tells interfaces of one name apart. The files
-/// of another machine can be neither seen nor made. Throws Failure.
+/// Changes the configuration name of an interface through the provider, and reads it back
+/// to be sure. The interface may also be given as the InstanceID of its setting
+/// ("BMC%eth1"), since two systems may have interfaces of the same name. Files of another
+/// machine can be neither seen nor made. Throws Failure.
 [[nodiscard]] RenameReport rename(const RenameCommand& command, Client& client);
 
 [[nodiscard]] std::string renameText(const RenameReport& report);
 
 /// {"operation": "rename", "interface", "file", "fileCreated", "directoryCreated",
-/// "oldName", "newName"}; an old name that there was not is null, as is the file of another
+/// "oldName", "newName"}. "oldName" is null when there was none, "file" for another
 /// machine.
 [[nodiscard]] std::string renameJson(const RenameReport& report);
 

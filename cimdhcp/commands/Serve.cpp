@@ -13,8 +13,8 @@
 #include <system_error>
 #include <thread>
 
-#include "client/Failure.h"
 #include "text/DisplayText.h"
+#include "text/Failure.h"
 #include "tklogger/TKLogger.h"
 #include "wbem/Server.h"
 #include "zrcommon/File.h"
@@ -52,8 +52,8 @@ cimom::wbem::ServerSettings settingsOf(const ServeCommand& command) {
     return settings;
 }
 
-/// What an administrator may have to know is kept by default (LOG_LEVEL 6000),
-/// what only helps to find a fault is not.
+/// Notices and failures are kept by default (LOG_LEVEL 6000); lines about each request,
+/// which only help to find a fault, are not.
 void log(cimom::wbem::LogKind kind, const std::string& message) {
     constexpr int important = 6000;
     constexpr int flow = 4000;
@@ -77,8 +77,8 @@ sigset_t blockEndSignals() {
     return signals;
 }
 
-/// Ends the process, without what cannot be ended, should that take too long: an
-/// operation of a provider may never return, and its thread cannot be stopped.
+/// Ends the process by force when its orderly end takes too long: an operation of a
+/// provider may never return, and its thread cannot be stopped.
 class EndInTime {
   public:
     explicit EndInTime(std::chrono::seconds patience)

@@ -22,8 +22,8 @@ struct Listening {
 [[nodiscard]] Listening readListening(const std::string& text);
 
 /// Runs the WBEM server until the process gets SIGTERM or SIGINT, which it blocks
-/// in this thread. Prints one line when the server can be asked. What it tells goes
-/// to the logging service. Throws Failure when the server cannot start.
+/// in this thread. Prints one line when the server accepts connections, and logs the rest.
+/// Throws Failure when the server cannot start.
 void serve(const ServeCommand& command, EmbeddedClient& client, std::ostream& out);
 
 }  // namespace cimdhcp

@@ -7,8 +7,8 @@
 #include <stdexcept>
 #include <string>
 
-#include "client/Failure.h"
 #include "text/DisplayText.h"
+#include "text/Failure.h"
 #include "wbem/Users.h"
 
 namespace cimdhcp {
@@ -65,9 +65,10 @@ std::string askPassword(const std::string& name, std::ostream& prompts) {
 
 void addUser(const UserAddCommand& command, std::ostream& out, std::ostream& prompts) {
     if (!cimom::wbem::isUserName(command.name)) {
-        throw Failure(ExitStatus::usage, "\"" + printable(command.name) +
-                                             "\" is no user name: letters, digits, \".\", \"-\", "
-                                             "\"_\" and \"@\", at most 64");
+        throw Failure(ExitStatus::usage,
+                      "\"" + printable(command.name) +
+                          "\" is not a user name: letters, digits, \".\", \"-\", "
+                          "\"_\" and \"@\", at most 64");
     }
     try {
         cimom::wbem::User user;

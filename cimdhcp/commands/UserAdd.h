@@ -7,8 +7,8 @@
 namespace cimdhcp {
 
 /// Adds a user to the server's users file, or changes role and password. On a
-/// terminal the password is asked for twice on `prompts`, without an echo; else it
-/// is the first line of standard input. Throws Failure.
+/// terminal the password is asked for twice on `prompts`, without an echo; otherwise
+/// it is the first line of standard input. Throws Failure.
 void addUser(const UserAddCommand& command, std::ostream& out, std::ostream& prompts);
 
 }  // namespace cimdhcp

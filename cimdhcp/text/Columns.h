@@ -1,15 +1,23 @@
 #pragma once
 
 #include <algorithm>
+#include <cstddef>
 #include <functional>
-#include <optional>
 #include <string>
 #include <vector>
 
-#include "text/SortOrder.h"
+#include "text/NaturalOrder.h"
 #include "text/Table.h"
 
 namespace cimdhcp {
+
+/// Which of the names of columns a person means: without regard to case, and with
+/// hyphens or underscores in place of blanks. Throws Failure when it is none of them.
+[[nodiscard]] std::size_t columnNamed(const std::string& wanted,
+                                      const std::vector<std::string>& names);
+
+/// The text, or "-" for an empty one: a cell that is never blank.
+[[nodiscard]] std::string cellOf(const std::string& text);
 
 /// One column of a table of records.
 template <typename Row>

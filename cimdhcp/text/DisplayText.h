@@ -8,7 +8,7 @@
 namespace cimdhcp {
 
 /// The text as it can be shown to a person: control characters, which could steer
-/// a terminal, and bytes that are no UTF-8 become \xNN, other characters that
+/// a terminal, and bytes that are not UTF-8 become \xNN, other characters that
 /// cannot be printed \uNNNN or \UNNNNNNNN.
 [[nodiscard]] std::string printable(std::string_view text);
 

@@ -1,22 +1,24 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
 #include <optional>
 #include <string>
 
-#include "arguments/CommandLine.h"
 #include "text/Style.h"
 
 namespace cimdhcp {
 
-/// How answers are shown.
+enum class Format : std::uint8_t { table, mof, json };
+
+/// How results are shown.
 struct Presentation {
     Format format = Format::table;
     std::optional<std::size_t> width;  ///< columns to write in; none: as many as there are
     Style style;
     std::optional<std::string> sort;  ///< by this column or property
-    bool comments = false;            ///< what is printed knows comments that begin with "//"
-    bool count = false;               ///< how many there are, and nothing else
+    bool comments = false;            ///< the output is in a language with "//" comments
+    bool count = false;               ///< the number of results alone
 
     [[nodiscard]] bool json() const noexcept { return format == Format::json; }
 

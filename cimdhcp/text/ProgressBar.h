@@ -7,8 +7,7 @@
 
 namespace cimdhcp {
 
-/// A line on a terminal that tells how far something is. Without a width it shows
-/// nothing.
+/// A progress line on a terminal. Without a width it shows nothing.
 class ProgressBar {
   public:
     ProgressBar(std::ostream& terminal, std::optional<std::size_t> width, std::size_t total);

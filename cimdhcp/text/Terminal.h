@@ -5,7 +5,7 @@
 
 namespace cimdhcp {
 
-/// How many columns there are to write in: none when the descriptor is no
+/// How many columns there are to write in: none when the descriptor is not a
 /// terminal, since what goes into a pipe or a file is never cut. On a terminal
 /// `columns` (the variable COLUMNS, null when not set) counts first, then what the
 /// terminal says, then 80.

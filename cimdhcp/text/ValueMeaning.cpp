@@ -1,11 +1,13 @@
 #include "text/ValueMeaning.h"
 
 #include <cstdint>
-#include <limits>
+#include <memory>
 #include <string_view>
 #include <variant>
 
+#include "cimom/ObjectPathText.h"
 #include "text/IntegerText.h"
+#include "text/MofText.h"
 
 namespace cimdhcp {
 
@@ -36,7 +38,7 @@ std::optional<Integer> integerOf(const cimom::Scalar& value) {
 }
 
 /// Whether a range covers the number. A missing end stands for the lowest or
-/// highest value of the type; an end that is no number covers nothing.
+/// highest value of the type; an end that is not a number covers nothing.
 bool rangeCovers(std::string_view entry, std::size_t sign, Integer number) {
     const std::string_view low = entry.substr(0, sign);
     const std::string_view high = entry.substr(sign + rangeSign.size());
@@ -53,6 +55,24 @@ bool covers(std::string_view entry, Integer number) {
     }
     const auto single = readInteger(entry);
     return single && *single == number;
+}
+
+const cimom::PropertyDeclaration* declarationOf(const cimom::ClassDeclaration* declaration,
+                                                const std::string& name) {
+    return declaration == nullptr ? nullptr : declaration->property(name);
+}
+
+std::string shown(const cimom::PropertyDeclaration* property, const cimom::Scalar& value) {
+    if (const auto* path = std::get_if<std::shared_ptr<const cimom::ObjectPath>>(&value)) {
+        return cimom::toText(**path);
+    }
+    std::string text = mofLiteral(value);
+    if (property != nullptr) {
+        if (const auto words = meaning(*property, value)) {
+            text += " (" + *words + ')';
+        }
+    }
+    return text;
 }
 
 }  // namespace
@@ -82,6 +102,47 @@ std::optional<std::string> meaning(const cimom::PropertyDeclaration& declaration
         }
     }
     return otherwise;
+}
+
+std::string heldText(const cimom::Value* value) {
+    const cimom::Scalar* const scalar = value == nullptr ? nullptr : value->scalar();
+    const auto* const text = scalar == nullptr ? nullptr : std::get_if<std::string>(scalar);
+    return text == nullptr ? std::string() : *text;
+}
+
+std::string meaningOf(const cimom::ClassDeclaration* declaration,
+                      const cimom::NamedValue& property) {
+    const cimom::PropertyDeclaration* const known = declarationOf(declaration, property.name);
+    if (known == nullptr) {
+        return {};
+    }
+    if (const cimom::Scalar* const scalar = property.value.scalar()) {
+        return meaning(*known, *scalar).value_or("");
+    }
+    std::string text;
+    bool found = false;
+    if (const cimom::Array* const elements = property.value.array()) {
+        for (const cimom::Scalar& element : *elements) {
+            const auto words = meaning(*known, element);
+            found = found || words;
+            text += (text.empty() ? "" : ", ") + words.value_or(mofLiteral(element));
+        }
+    }
+    return found ? text : std::string();
+}
+
+std::string valueWithMeaning(const cimom::ClassDeclaration* declaration,
+                             const cimom::NamedValue& property) {
+    const cimom::PropertyDeclaration* const known = declarationOf(declaration, property.name);
+    if (const cimom::Array* const elements = property.value.array()) {
+        std::string text = "{";
+        for (const cimom::Scalar& element : *elements) {
+            text += (text.size() > 1 ? ", " : "") + shown(known, element);
+        }
+        return text + '}';
+    }
+    const cimom::Scalar* const scalar = property.value.scalar();
+    return scalar == nullptr ? "NULL" : shown(known, *scalar);
 }
 
 }  // namespace cimdhcp

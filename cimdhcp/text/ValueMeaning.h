@@ -18,4 +18,18 @@ namespace cimdhcp {
 [[nodiscard]] std::optional<std::string> meaning(const cimom::PropertyDeclaration& declaration,
                                                  const cimom::Scalar& value);
 
+/// The text that a value holds; empty when it holds none. Null: there is no value.
+[[nodiscard]] std::string heldText(const cimom::Value* value);
+
+/// The meaning of a property's value, those of an array's elements with commas
+/// between them (an element without one stands as it is). Empty when there is
+/// none, or `declaration` is null: the class is not known.
+[[nodiscard]] std::string meaningOf(const cimom::ClassDeclaration* declaration,
+                                    const cimom::NamedValue& property);
+
+/// The value with its meaning behind it, as it is shown to a person: "2 (Enabled)",
+/// "{8 (Domain Name Server), 14}". References are shown as plain paths.
+[[nodiscard]] std::string valueWithMeaning(const cimom::ClassDeclaration* declaration,
+                                           const cimom::NamedValue& property);
+
 }  // namespace cimdhcp

@@ -4,8 +4,8 @@
 #include <algorithm>
 
 #include "Input.h"
-#include "client/Failure.h"
 #include "commands/Serve.h"
+#include "text/Failure.h"
 
 namespace {
 

@@ -8,10 +8,10 @@
 #include "arguments/ValueReading.h"
 #include "cimom/DateTimeText.h"
 #include "cimxml/XmlDocument.h"
-#include "client/Failure.h"
 #include "text/DisplayText.h"
+#include "text/Failure.h"
 #include "text/IntegerText.h"
-#include "text/ValueText.h"
+#include "text/MofText.h"
 
 namespace {
 

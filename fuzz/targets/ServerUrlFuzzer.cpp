@@ -6,7 +6,7 @@
 
 #include "Input.h"
 #include "client/Credentials.h"
-#include "client/Failure.h"
+#include "text/Failure.h"
 
 namespace {
 

@@ -5,12 +5,12 @@
 
 #include <algorithm>
 #include <cerrno>
-#include <cstdint>
 #include <cstring>
 #include <optional>
 #include <string_view>
 
 #include "zrcommon/File.h"
+#include "zrcommon/InterfaceFile.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace ZR::DHCPClientProvider {
@@ -98,14 +98,7 @@ bool replaceContent(int fd, const std::string& before, const std::string& after)
 }  // namespace
 
 std::string configurationFilePath(const std::string& directory, const std::string& interfaceName) {
-    const bool unusable = std::any_of(interfaceName.begin(), interfaceName.end(), [](char c) {
-        const auto byte = static_cast<std::uint8_t>(c);
-        return c == '/' || byte < 0x20 || byte == 0x7F;
-    });
-    if (unusable || interfaceName.empty() || interfaceName == "." || interfaceName == "..") {
-        return {};
-    }
-    return directory + "ifcfg-" + interfaceName;
+    return InterfaceFile::path(directory, interfaceName).value_or("");
 }
 
 std::optional<std::string> rewriteValue(const std::string& path, const std::string& key,

@@ -3,6 +3,7 @@
 #include "Lindows/ConfigurationFile.h"
 #include "Lindows/ElementIteration.h"
 #include "zrcommon/File.h"
+#include "zrcommon/InterfaceFile.h"
 #include "zrcommon/PlatformUtilities.h"
 #include "zrcommon/PropertyFile.h"
 #include "zrcommon/Strings.h"
@@ -18,7 +19,7 @@ namespace {
 
 const TraceSource source{"Lindows/DHCPSettingData", loggerDHCPSettingData};
 
-constexpr const char* configurationNameKey = "CONFIG_NAME";
+constexpr const char* configurationNameKey = InterfaceFile::configurationName;
 
 /// The path of an interface's file, traced; empty when the name can name none,
 /// which is told in a failure line.

@@ -78,7 +78,7 @@ void send(int fd, const std::string& text) {
 
 }  // namespace
 
-RawServer::RawServer(std::vector<std::string> answers) : answers_(std::move(answers)) {
+RawServer::RawServer(std::vector<std::string> responses) : responses_(std::move(responses)) {
     std::tie(listening_, port_) = listenAnywhere();
     std::array<int, 2> ends{};
     if (::pipe(ends.data()) != 0) {
@@ -111,7 +111,7 @@ void RawServer::serve() {
             return;
         }
         ZR::UniqueFd connection(::accept4(listening_.get(), nullptr, nullptr, SOCK_CLOEXEC));
-        if (next >= answers_.size()) {
+        if (next >= responses_.size()) {
             held_.push_back(std::move(connection));
             continue;
         }
@@ -120,7 +120,7 @@ void RawServer::serve() {
             const std::lock_guard lock(mutex_);
             requests_.push_back(std::move(request));
         }
-        send(connection.get(), answers_[next++]);
+        send(connection.get(), responses_[next++]);
     }
 }
 
@@ -128,14 +128,14 @@ std::uint16_t deadPort() {
     return listenAnywhere().second;
 }
 
-std::string httpAnswer(const std::string& body, const std::string& status,
-                       const std::string& headers) {
+std::string httpResponse(const std::string& body, const std::string& status,
+                         const std::string& headers) {
     return "HTTP/1.1 " + status + "\r\nContent-Type: application/xml\r\nConnection: close\r\n" +
            headers + "Content-Length: " + std::to_string(body.size()) + "\r\n\r\n" + body;
 }
 
-std::string cimAnswer(const std::string& method, const std::string& content) {
-    return httpAnswer(
+std::string cimResponse(const std::string& method, const std::string& content) {
+    return httpResponse(
         "<CIM CIMVERSION='2.0' DTDVERSION='2.0'><MESSAGE ID='1' PROTOCOLVERSION="
         "'1.0'><SIMPLERSP><IMETHODRESPONSE NAME='" +
         method + "'>" + content + "</IMETHODRESPONSE></SIMPLERSP></MESSAGE></CIM>");

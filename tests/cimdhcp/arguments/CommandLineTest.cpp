@@ -4,7 +4,7 @@
 
 #include <cstdlib>
 
-#include "client/Failure.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 namespace {

@@ -4,9 +4,9 @@
 
 #include <filesystem>
 
-#include "client/Failure.h"
 #include "kit/Files.h"
 #include "kit/TemporaryDirectory.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 namespace {
@@ -37,16 +37,6 @@ class DirectoriesFound : public ::testing::Test {
 
     TemporaryDirectory root_;
 };
-
-TEST(Installations, BeginWithTheOneOfTheExecutable) {
-    const auto places = installations("/opt/dhcp/bin/cimdhcp");
-    ASSERT_EQ(places.size(), 2U);
-    EXPECT_EQ(places[0].schema, "/opt/dhcp/share/dhcp-client-provider/schema");
-    EXPECT_EQ(places[0].registrations, places[0].schema);
-    EXPECT_EQ(places[0].providers.back(), "/opt/dhcp/lib/cmpi");
-    EXPECT_TRUE(places[1].schema.is_absolute());
-    EXPECT_EQ(places[1].registrations, places[1].schema);
-}
 
 TEST_F(DirectoriesFound, AreThoseOfTheFirstInstallationWithASchema) {
     const Directories empty{root_.path() / "none", root_.path() / "none", {"/none"}};
@@ -83,27 +73,6 @@ TEST_F(DirectoriesFound, MustExistWhenNamed) {
     EXPECT_EQ(
         refusal([&] { return findDirectories(options, {place}); }),
         root_ / "missing" + ": no such directory (from --provider-dir or CIMDHCP_PROVIDER_DIR)");
-}
-
-TEST(RegistrationFiles, AreSortedByName) {
-    const TemporaryDirectory directory;
-    for (const char* name : {"b.registration", "a.registration", "c.mof"}) {
-        writeFile(directory / name, "");
-    }
-    EXPECT_EQ(registrationFiles(directory.path()),
-              (std::vector<fs::path>{directory / "a.registration", directory / "b.registration"}));
-}
-
-TEST(RegistrationFiles, MustBeThere) {
-    const TemporaryDirectory directory;
-    EXPECT_EQ(refusal([&] { return registrationFiles(directory.path()); }),
-              directory.path().string() + ": no *.registration file is in it");
-    EXPECT_EQ(refusal([&] { return registrationFiles(directory / "missing"); }),
-              directory / "missing" + ": No such file or directory");
-}
-
-TEST(ExecutableFile, IsThisTest) {
-    EXPECT_EQ(executableFile().filename(), "cimdhcp_test");
 }
 
 }  // namespace

@@ -1,95 +1,72 @@
-#include "arguments/OptionGroups.h"
-
 #include <gtest/gtest.h>
 
-#include "client/Failure.h"
+#include <CLI/CLI.hpp>
+#include <algorithm>
+
+#include "arguments/OptionGroups.h"
 
 namespace cimdhcp {
 namespace {
 
-CommandLine line(const std::vector<std::string>& arguments) {
-    return std::get<CommandLine>(readCommandLine(arguments));
+/// What the options read into a command that had its defaults.
+ServeCommand read(std::vector<std::string> arguments) {
+    CLI::App app;
+    ServeCommand serve;
+    addServeOptions(app, serve);
+    // The parser takes them from the end.
+    std::reverse(arguments.begin(), arguments.end());
+    app.parse(arguments);
+    return serve;
 }
 
-std::string refusal(const std::vector<std::string>& arguments) {
-    try {
-        static_cast<void>(readCommandLine(arguments));
-        return "accepted";
-    } catch (const Failure& failure) {
-        EXPECT_EQ(failure.status(), ExitStatus::usage);
-        return failure.what();
+TEST(ServeOptions, LeaveTheDefaultsAlone) {
+    EXPECT_EQ(read({}), ServeCommand());
+}
+
+TEST(ServeOptions, SayWhereToListenAndWhoMayAsk) {
+    ServeCommand serve;
+    serve.listen = "[::1]:5989";
+    serve.tlsCertificate = "c";
+    serve.tlsKey = "k";
+    serve.users = "u";
+    serve.readOnly = true;
+    EXPECT_EQ(read({"--listen", "[::1]:5989", "--tls-cert", "c", "--tls-key", "k", "--users", "u",
+                    "--read-only"}),
+              serve);
+}
+
+TEST(ServeOptions, EachLimitIsItsOwn) {
+    ServeCommand serve;
+    serve.limits.headerLine = 1;
+    serve.limits.headers = 2;
+    serve.limits.body = 3;
+    serve.limits.depth = 4;
+    serve.limits.connections = 5;
+    serve.limits.waiting = 6;
+    serve.limits.sessions.sessions = 7;
+    serve.limits.result = 8;
+    serve.limits.workers = 9;
+    serve.limits.stuck = 10;
+    serve.limits.ioThreads = 11;
+    serve.limits.request = std::chrono::seconds(12);
+    serve.limits.answer = std::chrono::seconds(13);
+    serve.limits.sessions.defaultTimeout = std::chrono::seconds(14);
+    serve.limits.sessions.longestTimeout = std::chrono::seconds(15);
+    std::vector<std::string> arguments;
+    for (const char* option :
+         {"--max-header-line", "--max-headers", "--max-body", "--max-depth", "--max-connections",
+          "--max-waiting", "--max-enumerations", "--max-result", "--workers", "--max-stuck",
+          "--io-threads", "--request-timeout", "--answer-timeout", "--enumeration-timeout",
+          "--max-enumeration-timeout"}) {
+        arguments.emplace_back(option);
+        arguments.push_back(std::to_string(arguments.size() / 2 + 1));
     }
+    EXPECT_EQ(read(arguments), serve);
 }
 
-TEST(OptionGroups, NamesServers) {
-    Options options;
-    options.connect = {"a", "https://b"};
-    options.hosts = "-";
-    options.parallel = 256;
-    options.timeout = std::chrono::seconds(5);
-    options.credentials = "c";
-    options.caCertificate = "ca";
-    options.insecure = true;
-    EXPECT_EQ(
-        line({"--connect", "a", "show", "--connect", "https://b", "--hosts", "-", "--parallel",
-              "256", "--timeout", "5", "--credentials", "c", "--cacert", "ca", "--insecure"}),
-        (CommandLine{options, ShowCommand{}}));
-    EXPECT_TRUE(options.remote());
-    EXPECT_FALSE(Options{}.remote());
-}
-
-TEST(OptionGroups, AnAddressInBracketsKeepsThem) {
-    const std::vector<std::string> servers{"[::1]", "[::1]:5988", "[a,b]"};
-    EXPECT_EQ(line({"--connect", "[::1]", "--connect=[::1]:5988", "--connect=[a,b]", "show"})
-                  .options.connect,
-              servers);
-}
-
-TEST(OptionGroups, SaysHowTheAnswerIsShown) {
-    Options options;
-    options.noHeader = true;
-    options.sort = "STATE";
-    options.count = true;
-    options.time = true;
-    options.color = ColorMode::always;
-    EXPECT_EQ(
-        line({"show", "--no-header", "--sort", "STATE", "--count", "--time", "--color", "always"}),
-        (CommandLine{options, ShowCommand{}}));
-    EXPECT_EQ(line({"show", "--color=never"}).options.color, ColorMode::never);
-    EXPECT_EQ(line({"show", "--color=auto"}).options.color, ColorMode::automatic);
-}
-
-TEST(OptionGroups, RefusesWhatServersCannotBeAsked) {
-    for (const std::vector<std::string>& command : {std::vector<std::string>{"tree"},
-                                                    {"serve"},
-                                                    {"check"},
-                                                    {"user", "add", "--users", "f", "a"}}) {
-        std::vector<std::string> arguments{"--connect", "h"};
-        arguments.insert(arguments.end(), command.begin(), command.end());
-        EXPECT_EQ(refusal(arguments),
-                  "this command is about this machine alone; --connect and --hosts are not for it");
-    }
-    EXPECT_EQ(refusal({"--connect", "h", "rename", "--create", "eth0", "x"}),
-              "--create cannot make files on other machines");
-    EXPECT_EQ(refusal({"--hosts", "f", "--tree", "t", "show"}),
-              "--tree and --data-dir are about this machine; they cannot be given with --connect "
-              "or --hosts");
-    for (const char* option : {"--credentials=c", "--cacert=c", "--insecure"}) {
-        EXPECT_NE(refusal({option, "show"}), "accepted");
-    }
-    for (const char* option : {"--parallel=0", "--parallel=257", "--timeout=0", "--timeout=-1",
-                               "--timeout=x", "--timeout=86401", "--color=red"}) {
-        EXPECT_NE(refusal({"--connect", "h", option, "show"}), "accepted") << option;
-    }
-}
-
-TEST(OptionGroups, RefusesToSortAndCountWhatIsNoList) {
-    EXPECT_EQ(refusal({"graph", "--count"}),
-              "this command answers no list: there is nothing to count");
-    EXPECT_EQ(refusal({"rename", "a", "b", "--sort", "x"}),
-              "this command answers no list: there is nothing to sort");
-    EXPECT_NE(refusal({"get", "P", "--count"}), "accepted");
-    EXPECT_NE(refusal({"serve", "--count"}), "accepted");
+TEST(ServeOptions, RefuseWhatIsNotANumber) {
+    EXPECT_THROW(static_cast<void>(read({"--max-body", "much"})), CLI::ParseError);
+    EXPECT_THROW(static_cast<void>(read({"--answer-timeout", "x"})), CLI::ParseError);
 }
 
 }  // namespace

@@ -3,8 +3,8 @@
 #include <gtest/gtest.h>
 
 #include "cimom/ObjectPathText.h"
-#include "client/Failure.h"
 #include "kit/SmallSchema.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 namespace {
@@ -36,7 +36,7 @@ TEST_F(PathArgument, HasTheDefaultNamespaceWhenItNamesNone) {
 
 TEST_F(PathArgument, NeedsAKeyWhenItsClassHasKeys) {
     EXPECT_EQ(refusal([&] { return read("TEST_Base"); }),
-              "\"TEST_Base\" names a class and no instance: its keys are missing; list the paths "
+              "\"TEST_Base\" names a class, not an instance: its keys are missing; list the paths "
               "with: cimdhcp names TEST_Base");
     EXPECT_EQ(cimom::toText(read("TEST_Keyless")), "root/cimv2:TEST_Keyless");
     // What there is to say about an unknown class is for the object manager to say.

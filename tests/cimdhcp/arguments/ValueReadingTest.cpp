@@ -2,9 +2,9 @@
 
 #include <gtest/gtest.h>
 
-#include "client/Failure.h"
 #include "kit/SmallSchema.h"
-#include "text/ValueText.h"
+#include "text/Failure.h"
+#include "text/MofText.h"
 
 namespace cimdhcp {
 namespace {

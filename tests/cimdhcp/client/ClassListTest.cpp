@@ -22,29 +22,5 @@ TEST_F(ClassList, KnowsSuperclassAndKind) {
                   {"TEST_Link", "", true, "Links", {"root/cimv2"}}}));
 }
 
-TEST_F(ClassList, IsATable) {
-    EXPECT_EQ(classTable(servedClasses(registrations_, repository_), std::nullopt),
-              "CLASS       SUPERCLASS  KIND         PROVIDER\n"
-              "TEST_Thing  TEST_Base   element      Things\n"
-              "TEST_Link   -           association  Links\n");
-}
-
-TEST_F(ClassList, IsJson) {
-    EXPECT_EQ(classJson(servedClasses({registrations_.back()}, repository_)), R"({
-  "classes": [
-    {
-      "class": "TEST_Link",
-      "superclass": null,
-      "kind": "association",
-      "provider": "Links",
-      "namespaces": [
-        "root/cimv2"
-      ]
-    }
-  ]
-}
-)");
-}
-
 }  // namespace
 }  // namespace cimdhcp

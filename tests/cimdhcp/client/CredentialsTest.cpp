@@ -5,10 +5,10 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include "client/Failure.h"
 #include "kit/ChildProcess.h"
 #include "kit/Files.h"
 #include "kit/TemporaryDirectory.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 namespace {
@@ -118,7 +118,7 @@ TEST_F(CredentialsFile, OfAnotherUserIsRefused) {
         GTEST_SKIP() << "only root can give a file away";
     }
     constexpr ::uid_t somebody = 65534;
-    // Root's own file may be used by everybody who can read it, which is root.
+    // Every user who can read root's own file may use it: root alone can.
     EXPECT_EQ(refusal(), "accepted");
     ASSERT_EQ(::chown(file_.c_str(), somebody, somebody), 0);
     EXPECT_THAT(refusal(), HasSubstr("belongs to another user"));
@@ -137,7 +137,7 @@ TEST_F(CredentialsFile, ThatIsNoneIsRefused) {
     ASSERT_EQ(::unlink(file_.c_str()), 0);
     EXPECT_EQ(refusal(), file_ + ": No such file or directory");
     ASSERT_EQ(::mkfifo(file_.c_str(), 0600), 0);
-    EXPECT_EQ(refusal(), file_ + ": is no regular file");
+    EXPECT_EQ(refusal(), file_ + ": is not a regular file");
 }
 
 }  // namespace

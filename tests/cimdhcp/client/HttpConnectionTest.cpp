@@ -26,20 +26,20 @@ std::string reason(const std::string& url, const HttpSettings& settings = {},
     }
 }
 
-std::string reasonOf(const std::string& answer) {
-    const test::RawServer server({answer});
+std::string reasonOf(const std::string& response) {
+    const test::RawServer server({response});
     return reason(server.url());
 }
 
 TEST(HttpConnection, PostsAndTakesTheAnswer) {
-    const test::RawServer server({test::httpAnswer("<x/>", "200 OK", "X-Thing:  a: b \r\n")});
+    const test::RawServer server({test::httpResponse("<x/>", "200 OK", "X-Thing:  a: b \r\n")});
     HttpConnection connection(readServerUrl(server.url()), {}, Deadline(patience));
-    const HttpReply reply = connection.post({"CIMMethod: GetClass"}, "the body");
-    EXPECT_EQ(reply.status, 200U);
-    EXPECT_EQ(reply.body, "<x/>");
-    ASSERT_NE(reply.header("x-thing"), nullptr);
-    EXPECT_EQ(*reply.header("x-thing"), "a: b");
-    EXPECT_EQ(reply.header("other"), nullptr);
+    const HttpResponse response = connection.post({"CIMMethod: GetClass"}, "the body");
+    EXPECT_EQ(response.status, 200U);
+    EXPECT_EQ(response.body, "<x/>");
+    ASSERT_NE(response.header("x-thing"), nullptr);
+    EXPECT_EQ(*response.header("x-thing"), "a: b");
+    EXPECT_EQ(response.header("other"), nullptr);
     ASSERT_EQ(server.requests().size(), 1U);
     const std::string request = server.requests().at(0);
     EXPECT_THAT(request, StartsWith("POST /cimom HTTP/1.1\r\n"));
@@ -50,7 +50,7 @@ TEST(HttpConnection, PostsAndTakesTheAnswer) {
 }
 
 TEST(HttpConnection, SendsUserAndPasswordAtOnce) {
-    const test::RawServer server({test::httpAnswer("")});
+    const test::RawServer server({test::httpResponse("")});
     HttpSettings settings;
     settings.credential = Credential{"127.0.0.1", std::nullopt, "ada", "a:b"};
     EXPECT_EQ(reason(server.url(), settings), "HTTP 200");
@@ -59,8 +59,8 @@ TEST(HttpConnection, SendsUserAndPasswordAtOnce) {
 }
 
 TEST(HttpConnection, FollowsNoRedirection) {
-    const test::RawServer other({test::httpAnswer("")});
-    EXPECT_EQ(reasonOf(test::httpAnswer("", "302 Found", "Location: " + other.url() + "\r\n")),
+    const test::RawServer other({test::httpResponse("")});
+    EXPECT_EQ(reasonOf(test::httpResponse("", "302 Found", "Location: " + other.url() + "\r\n")),
               "HTTP 302");
     EXPECT_TRUE(other.requests().empty());
 }
@@ -70,15 +70,15 @@ TEST(HttpConnection, ToldFailuresAreOneLine) {
               "cannot be reached: Connection refused");
     EXPECT_EQ(reason("http://no-such-host.invalid"),
               "there is no address for the name no-such-host.invalid");
-    EXPECT_EQ(reasonOf(""), "it closed the connection without an answer");
+    EXPECT_EQ(reasonOf(""), "it closed the connection without a response");
     EXPECT_EQ(reasonOf("HTTP/1.1 200 OK\r\nContent-Length: 100\r\n\r\nshort"),
-              "the answer is cut off");
-    EXPECT_THAT(reasonOf("SSH-2.0-server\r\n"), StartsWith("no usable answer ("));
-    EXPECT_THAT(reasonOf("\x16\x03\x01\r\n\r\n"), StartsWith("no usable answer ("));
+              "the response is cut off");
+    EXPECT_THAT(reasonOf("SSH-2.0-server\r\n"), StartsWith("no usable response ("));
+    EXPECT_THAT(reasonOf("\x16\x03\x01\r\n\r\n"), StartsWith("no usable response ("));
     EXPECT_THAT(reasonOf("HTTP/1.1 200 OK\r\nContent-Length: many\r\n\r\n"),
-                StartsWith("no usable answer ("));
+                StartsWith("no usable response ("));
     EXPECT_THAT(reasonOf("HTTP/1.1 200 OK\r\nTransfer-Encoding: chunked\r\n\r\nnot a number\r\n"),
-                StartsWith("no usable answer ("));
+                StartsWith("no usable response ("));
     const test::RawServer plain({"HTTP/1.1 400 Bad Request\r\n\r\n"});
     EXPECT_THAT(reason("https://127.0.0.1:" + std::to_string(plain.port())),
                 StartsWith("it does not speak TLS, or none that is accepted ("));
@@ -86,28 +86,28 @@ TEST(HttpConnection, ToldFailuresAreOneLine) {
 
 TEST(HttpConnection, TakesNoMoreThanTheLimit) {
     HttpSettings settings;
-    settings.longestAnswer = 1000;
-    const test::RawServer server({test::httpAnswer(std::string(1000, 'x')),
-                                  test::httpAnswer(std::string(1001, 'x')),
+    settings.longestResponse = 1000;
+    const test::RawServer server({test::httpResponse(std::string(1000, 'x')),
+                                  test::httpResponse(std::string(1001, 'x')),
                                   "HTTP/1.1 200 OK\r\n\r\n" + std::string(100000, 'x'),
                                   "HTTP/1.1 200 OK\r\nX: " + std::string(70000, 'x') + "\r\n\r\n"});
     EXPECT_EQ(reason(server.url(), settings), "HTTP 200");
-    EXPECT_EQ(reason(server.url(), settings), "the answer is longer than 1000 bytes");
-    EXPECT_EQ(reason(server.url(), settings), "the answer is longer than 1000 bytes");
+    EXPECT_EQ(reason(server.url(), settings), "the response is longer than 1000 bytes");
+    EXPECT_EQ(reason(server.url(), settings), "the response is longer than 1000 bytes");
     EXPECT_EQ(reason(server.url(), settings),
-              "the headers of the answer are longer than 65536 bytes");
+              "the headers of the response are longer than 65536 bytes");
 }
 
 TEST(HttpConnection, AServerThatSaysNothingIsNotWaitedForBeyondTheDeadline) {
     const test::RawServer server({});
     EXPECT_EQ(reason(server.url(), {}, milliseconds(200)),
-              "no answer within 1 s; --timeout gives it longer");
+              "no response within 1 s; --timeout gives it longer");
     EXPECT_EQ(reason(server.url(), {}, milliseconds(0)),
-              "no answer within 0 s; --timeout gives it longer");
+              "no response within 0 s; --timeout gives it longer");
 }
 
 TEST(HttpConnection, AllRequestsHaveTheTimeUntilTheDeadlineTogether) {
-    const test::RawServer server({test::httpAnswer("")});
+    const test::RawServer server({test::httpResponse("")});
     HttpConnection connection(readServerUrl(server.url()), {}, Deadline(milliseconds(2000)));
     EXPECT_EQ(connection.post({}, "").status, 200U);
     EXPECT_THROW(connection.post({}, ""), ConnectionError);

@@ -10,26 +10,26 @@
 namespace cimdhcp {
 namespace {
 
-using test::cimAnswer;
-using test::httpAnswer;
+using test::cimResponse;
+using test::httpResponse;
 using testing::HasSubstr;
 
 const cimom::ObjectPath thing{"", "root/cimv2", "A_Thing", {{"Id", cimom::Value::ofString("1")}}};
 
 class RemoteServer : public ::testing::Test {
   protected:
-    RemoteClient& client(std::vector<std::string> answers, const HttpSettings& settings = {}) {
+    RemoteClient& client(std::vector<std::string> responses, const HttpSettings& settings = {}) {
         client_.reset();
-        server_.emplace(std::move(answers));
+        server_.emplace(std::move(responses));
         client_.emplace(readServerUrl(server_->url()), settings, Deadline(std::chrono::minutes(1)),
                         "root/cimv2");
         return *client_;
     }
 
     /// Why an enumeration fails.
-    std::string failure(const std::string& answer, const HttpSettings& settings = {}) {
+    std::string failure(const std::string& response, const HttpSettings& settings = {}) {
         try {
-            const Answer got = client({answer}, settings).enumerate(thing);
+            const Response got = client({response}, settings).enumerate(thing);
             return "status " + std::to_string(got.status.code);
         } catch (const Failure& failure) {
             EXPECT_EQ(failure.status(), ExitStatus::notLoaded);
@@ -43,7 +43,7 @@ class RemoteServer : public ::testing::Test {
 };
 
 TEST_F(RemoteServer, SaysInHeadersWhatTheMessageSays) {
-    client({cimAnswer("EnumerateInstances", "")}).enumerate(thing);
+    client({cimResponse("EnumerateInstances", "")}).enumerate(thing);
     const std::string request = server_->requests().at(0);
     EXPECT_THAT(request, HasSubstr("\r\nCIMOperation: MethodCall\r\n"));
     EXPECT_THAT(request, HasSubstr("\r\nCIMMethod: EnumerateInstances\r\n"));
@@ -54,11 +54,11 @@ TEST_F(RemoteServer, SaysInHeadersWhatTheMessageSays) {
 
 TEST_F(RemoteServer, StatusesOfTheStandardHaveTheirNames) {
     const auto told = [this](const std::string& error) {
-        RemoteClient& asked = client({cimAnswer("EnumerateInstances", error)});
-        const Answer answer = asked.enumerate(thing);
-        EXPECT_FALSE(answer.status.ok());
-        EXPECT_EQ(answer.returnDoneCalls, std::nullopt);
-        const Failure failure = asked.failure(answer, thing);
+        RemoteClient& asked = client({cimResponse("EnumerateInstances", error)});
+        const Response response = asked.enumerate(thing);
+        EXPECT_FALSE(response.status.ok());
+        EXPECT_EQ(response.returnDoneCalls, std::nullopt);
+        const Failure failure = asked.failure(response, thing);
         EXPECT_EQ(failure.status(), ExitStatus::notDone);
         return std::string(failure.what());
     };
@@ -76,46 +76,47 @@ TEST_F(RemoteServer, StatusesOfTheStandardHaveTheirNames) {
 }
 
 TEST_F(RemoteServer, FailuresOfHttpAreTold) {
-    EXPECT_EQ(failure(httpAnswer("", "401 Unauthorized", "WWW-Authenticate: Basic\r\n")),
+    EXPECT_EQ(failure(httpResponse("", "401 Unauthorized", "WWW-Authenticate: Basic\r\n")),
               "HTTP 401: it wants a user and a password; --credentials FILE holds them");
     HttpSettings settings;
     settings.credential = Credential{"127.0.0.1", std::nullopt, "ada", "geheim"};
-    EXPECT_EQ(failure(httpAnswer("", "401 Unauthorized", "WWW-Authenticate: Basic\r\n"), settings),
-              "HTTP 401: it refuses user ada with that password");
-    EXPECT_EQ(failure(httpAnswer("", "403 Forbidden")), "HTTP 403: it does not permit this");
-    EXPECT_EQ(failure(httpAnswer("", "501 Not Implemented",
-                                 "CIMError: unsupported-protocol-version\r\n")),
-              "HTTP 501 in place of an answer: unsupported-protocol-version");
-    EXPECT_EQ(failure(httpAnswer("<html/>", "404 Not Found")), "HTTP 404 in place of an answer");
-    EXPECT_EQ(failure(httpAnswer("", "204 No Content")), "HTTP 204 in place of an answer");
+    EXPECT_EQ(
+        failure(httpResponse("", "401 Unauthorized", "WWW-Authenticate: Basic\r\n"), settings),
+        "HTTP 401: it refuses user ada with that password");
+    EXPECT_EQ(failure(httpResponse("", "403 Forbidden")), "HTTP 403: it does not permit this");
+    EXPECT_EQ(failure(httpResponse("", "501 Not Implemented",
+                                   "CIMError: unsupported-protocol-version\r\n")),
+              "HTTP 501 in place of a response: unsupported-protocol-version");
+    EXPECT_EQ(failure(httpResponse("<html/>", "404 Not Found")), "HTTP 404 in place of a response");
+    EXPECT_EQ(failure(httpResponse("", "204 No Content")), "HTTP 204 in place of a response");
 }
 
 TEST_F(RemoteServer, AnswersThatAreNoneAreTold) {
-    EXPECT_EQ(failure(httpAnswer("")), "the answer is no XML: line 1: no element found");
-    EXPECT_EQ(failure(httpAnswer("<CIM><MESSAGE>")),
-              "the answer is no XML: line 1: no element found");
-    EXPECT_EQ(failure(httpAnswer("{}")),
-              "the answer is no XML: line 1: not well-formed (invalid token)");
-    EXPECT_EQ(failure(httpAnswer("<html><body/></html>")),
-              "the answer is no CIM-XML: element html where CIM belongs");
-    EXPECT_EQ(failure(cimAnswer("GetInstance", "")),
-              "the answer is no CIM-XML: a response to GetInstance");
-    EXPECT_EQ(failure(cimAnswer("EnumerateInstances", "<IRETURNVALUE><VALUE/></IRETURNVALUE>")),
-              "the answer is no CIM-XML: element VALUE where INSTANCE belongs");
-    EXPECT_EQ(failure(cimAnswer("EnumerateInstances",
-                                "<IRETURNVALUE><INSTANCE CLASSNAME='A'><PROPERTY NAME='n' "
-                                "TYPE='uint8'><VALUE>-1</VALUE></PROPERTY></INSTANCE>"
-                                "</IRETURNVALUE>")),
-              "the answer holds what is no value: n: \"-1\" is no uint8");
+    EXPECT_EQ(failure(httpResponse("")), "the response is not XML: line 1: no element found");
+    EXPECT_EQ(failure(httpResponse("<CIM><MESSAGE>")),
+              "the response is not XML: line 1: no element found");
+    EXPECT_EQ(failure(httpResponse("{}")),
+              "the response is not XML: line 1: not well-formed (invalid token)");
+    EXPECT_EQ(failure(httpResponse("<html><body/></html>")),
+              "the response is not CIM-XML: element html where CIM belongs");
+    EXPECT_EQ(failure(cimResponse("GetInstance", "")),
+              "the response is not CIM-XML: a response to GetInstance");
+    EXPECT_EQ(failure(cimResponse("EnumerateInstances", "<IRETURNVALUE><VALUE/></IRETURNVALUE>")),
+              "the response is not CIM-XML: element VALUE where INSTANCE belongs");
+    EXPECT_EQ(failure(cimResponse("EnumerateInstances",
+                                  "<IRETURNVALUE><INSTANCE CLASSNAME='A'><PROPERTY NAME='n' "
+                                  "TYPE='uint8'><VALUE>-1</VALUE></PROPERTY></INSTANCE>"
+                                  "</IRETURNVALUE>")),
+              "a value in the response is not valid: n: \"-1\" is no uint8");
     std::string deep;
     for (int depth = 0; depth < 100000; ++depth) {
         deep += "<a>";
     }
-    EXPECT_EQ(failure(httpAnswer(deep)),
-              "the answer is no XML: line 1: elements are nested too deep");
-    EXPECT_EQ(failure(httpAnswer("<!DOCTYPE a [<!ENTITY b 'c'>]><CIM>&b;</CIM>")),
-              "the answer is no XML: line 1: a document type declaration is not accepted");
-    EXPECT_THAT(failure(httpAnswer("<" + std::string(100000, 'a') + "/>")),
+    EXPECT_EQ(failure(httpResponse(deep)),
+              "the response is not XML: line 1: elements are nested too deep");
+    EXPECT_EQ(failure(httpResponse("<!DOCTYPE a [<!ENTITY b 'c'>]><CIM>&b;</CIM>")),
+              "the response is not XML: line 1: a document type declaration is not accepted");
+    EXPECT_THAT(failure(httpResponse("<" + std::string(100000, 'a') + "/>")),
                 testing::EndsWith("..."));
 }
 
@@ -128,30 +129,30 @@ constexpr const char* thingClass =
 
 TEST_F(RemoteServer, AnInstanceGetsThePathThatItWasAskedBy) {
     const std::string instance =
-        cimAnswer("GetInstance",
-                  "<IRETURNVALUE><INSTANCE CLASSNAME='A_Thing'>"
-                  "<PROPERTY NAME='System' TYPE='string'><VALUE>s</VALUE></PROPERTY>"
-                  "<PROPERTY NAME='Id' TYPE='string'><VALUE>1</VALUE></PROPERTY>"
-                  "<PROPERTY NAME='Caption' TYPE='string'/></INSTANCE></IRETURNVALUE>");
+        cimResponse("GetInstance",
+                    "<IRETURNVALUE><INSTANCE CLASSNAME='A_Thing'>"
+                    "<PROPERTY NAME='System' TYPE='string'><VALUE>s</VALUE></PROPERTY>"
+                    "<PROPERTY NAME='Id' TYPE='string'><VALUE>1</VALUE></PROPERTY>"
+                    "<PROPERTY NAME='Caption' TYPE='string'/></INSTANCE></IRETURNVALUE>");
     const auto pathText = [&](const cimom::ObjectPath& asked, const std::string& declaration) {
-        const Answer answer = client({instance, declaration}).get(asked);
-        EXPECT_EQ(answer.instances.size(), 1U);
+        const Response response = client({instance, declaration}).get(asked);
+        EXPECT_EQ(response.instances.size(), 1U);
         // A property that is null is as good as absent.
-        EXPECT_EQ(answer.instances.at(0)->properties.size(), 2U);
-        return cimom::toText(answer.instances.at(0)->path);
+        EXPECT_EQ(response.instances.at(0)->properties.size(), 2U);
+        return cimom::toText(response.instances.at(0)->path);
     };
-    const std::string known = cimAnswer("GetClass", thingClass);
+    const std::string known = cimResponse("GetClass", thingClass);
     EXPECT_EQ(pathText(thing, known), R"(root/cimv2:A_Thing.System="s",Id="1")");
     cimom::ObjectPath whole = thing;
     whole.keys.push_back({"SYSTEM", cimom::Value::ofString("s")});
     EXPECT_EQ(pathText(whole, known), R"(root/cimv2:A_Thing.Id="1",SYSTEM="s")");
-    const std::string unknown = cimAnswer("GetClass", "<ERROR CODE='6'/>");
+    const std::string unknown = cimResponse("GetClass", "<ERROR CODE='6'/>");
     EXPECT_EQ(pathText(thing, unknown), R"(root/cimv2:A_Thing.Id="1")");
 }
 
 TEST_F(RemoteServer, IsAskedForAClassOnce) {
     RemoteClient& asked =
-        client({cimAnswer("GetClass", thingClass), cimAnswer("GetClass", "<ERROR CODE='6'/>")});
+        client({cimResponse("GetClass", thingClass), cimResponse("GetClass", "<ERROR CODE='6'/>")});
     const ClassLookup classes = asked.classes();
     ASSERT_NE(classes.find("A_Thing"), nullptr);
     EXPECT_EQ(classes.find("A_Thing"), classes.find("A_Thing"));
@@ -162,7 +163,7 @@ TEST_F(RemoteServer, IsAskedForAClassOnce) {
 }
 
 TEST_F(RemoteServer, ServesTheClassesThatNoOtherDerivesFrom) {
-    const std::string classes = cimAnswer(
+    const std::string classes = cimResponse(
         "EnumerateClasses",
         "<IRETURNVALUE><CLASS NAME='CIM_Base'/><CLASS NAME='CIM_Leaf' SUPERCLASS='CIM_Base'/>"
         "<CLASS NAME='CIM_Link'><PROPERTY.REFERENCE NAME='R' REFERENCECLASS='CIM_Base'/></CLASS>"
@@ -178,9 +179,9 @@ TEST_F(RemoteServer, ServesTheClassesThatNoOtherDerivesFrom) {
 
 TEST_F(RemoteServer, ClassesThatGoRoundInCirclesHaveAnEnd) {
     const std::string classes =
-        cimAnswer("EnumerateClasses",
-                  "<IRETURNVALUE><CLASS NAME='A' SUPERCLASS='B'/><CLASS NAME='B' SUPERCLASS='A'/>"
-                  "<CLASS NAME='C' SUPERCLASS='A'/></IRETURNVALUE>");
+        cimResponse("EnumerateClasses",
+                    "<IRETURNVALUE><CLASS NAME='A' SUPERCLASS='B'/><CLASS NAME='B' SUPERCLASS='A'/>"
+                    "<CLASS NAME='C' SUPERCLASS='A'/></IRETURNVALUE>");
     EXPECT_THAT(client({classes}).servedClasses(),
                 testing::ElementsAre(ClassEntry{"C", "A", false, "", {"root/cimv2"}}));
 }
@@ -188,7 +189,7 @@ TEST_F(RemoteServer, ClassesThatGoRoundInCirclesHaveAnEnd) {
 TEST_F(RemoteServer, ThatRefusesTheClassesIsAFailure) {
     try {
         static_cast<void>(
-            client({cimAnswer("EnumerateClasses", "<ERROR CODE='3' DESCRIPTION='no'/>")})
+            client({cimResponse("EnumerateClasses", "<ERROR CODE='3' DESCRIPTION='no'/>")})
                 .servedClasses());
         ADD_FAILURE() << "accepted";
     } catch (const Failure& failure) {

@@ -5,9 +5,9 @@
 
 #include <sstream>
 
-#include "client/Failure.h"
 #include "kit/Files.h"
 #include "kit/TemporaryDirectory.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 namespace {
@@ -73,8 +73,7 @@ TEST(ServerUrl, UserAndPasswordAreRefusedAndNotRepeated) {
 
 TEST(ServerUrl, AnythingElseIsRefused) {
     EXPECT_EQ(refusal("ftp://host"), "\"ftp://host\": only http:// and https:// are spoken");
-    EXPECT_EQ(refusal(""),
-              "\"\": there is no host in it; it is to be of the form https://HOST[:PORT]");
+    EXPECT_EQ(refusal(""), "\"\": there is no host in it; the form is https://HOST[:PORT]");
     for (const char* text :
          {"https://", "https:///cimom", "-host", "host:", "host:0", "host:65536", "host:1x",
           "host name", "host\n", "host/a b", "host/\r\nX: y", "host/?q", "host/#f", "host?q",

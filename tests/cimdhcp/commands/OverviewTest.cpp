@@ -82,8 +82,9 @@ TEST(RemarkLine, IsOneLineOrNone) {
     const std::string both = remarkLine(remarks);
     EXPECT_EQ(both.find('\n'), both.size() - 1) << both;
     EXPECT_NE(both.find("Permission denied; cannot read"), std::string::npos) << both;
-    EXPECT_EQ(remarkLine(std::vector<std::string>{"a", "b", "c", "d", "e", "f"}),
-              "cimdhcp: not everything could be read: a; b; c; d; and 2 more, told in the log\n");
+    EXPECT_EQ(
+        remarkLine(std::vector<std::string>{"a", "b", "c", "d", "e", "f"}),
+        "cimdhcp: not everything could be read: a; b; c; d; and 2 more, which are in the log\n");
 }
 
 TEST(Overview, WithoutHeadingsIsRowsAlone) {

@@ -2,7 +2,7 @@
 
 #include <gtest/gtest.h>
 
-#include "client/Failure.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 

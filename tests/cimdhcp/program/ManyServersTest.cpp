@@ -82,32 +82,32 @@ TEST_F(ManyServers, SlowAndDeadOnesKeepNobodyWaiting) {
     // One deadline, not one after the other.
     EXPECT_LT(took, 2 * deadline);
 
-    std::map<std::string, nlohmann::json> answers;
+    std::map<std::string, nlohmann::json> responses;
     std::vector<std::string> order;
     std::istringstream lines(ended.out);
     for (std::string line; std::getline(lines, line);) {
-        const auto answer = nlohmann::json::parse(line);
-        order.push_back(answer.at("host"));
-        answers[order.back()] = answer;
+        const auto response = nlohmann::json::parse(line);
+        order.push_back(response.at("host"));
+        responses[order.back()] = response;
     }
-    ASSERT_EQ(answers.size(), 50U);
+    ASSERT_EQ(responses.size(), 50U);
     for (std::size_t number = 0; number < alive; ++number) {
-        const auto& answer = answers.at(servers_[number]->url());
-        EXPECT_EQ(answer.at("status").at("exit"), 0);
-        EXPECT_EQ(answer.at("result").at("interfaces").at(0).at("interface"),
+        const auto& response = responses.at(servers_[number]->url());
+        EXPECT_EQ(response.at("status").at("exit"), 0);
+        EXPECT_EQ(response.at("result").at("interfaces").at(0).at("interface"),
                   "eth" + std::to_string(number));
     }
     // The silent ones came last: nobody waited for them.
     EXPECT_THAT((std::vector<std::string>{order.end() - 2, order.end()}),
                 testing::UnorderedElementsAre(bad[3], bad[4]));
     const std::string refused = ": cannot be reached: Connection refused\n";
-    const std::string late = ": no answer within 10 s; --timeout gives it longer\n";
+    const std::string late = ": no response within 10 s; --timeout gives it longer\n";
     EXPECT_EQ(ended.err, "cimdhcp: 5 of 50 servers failed:\n  " + bad[0] + refused + "  " + bad[1] +
                              refused + "  " + bad[2] + refused + "  " + bad[3] + late + "  " +
                              bad[4] + late);
     for (const std::string& host : bad) {
-        EXPECT_TRUE(answers.at(host).at("result").is_null());
-        EXPECT_EQ(answers.at(host).at("status").at("exit"), 3);
+        EXPECT_TRUE(responses.at(host).at("result").is_null());
+        EXPECT_EQ(responses.at(host).at("status").at("exit"), 3);
     }
 }
 
@@ -160,7 +160,7 @@ TEST_F(ManyServers, ACimStatusIsAFailureOfItsServer) {
 TEST_F(ManyServers, GarbageIsAFailureOfItsServer) {
     serve(1);
     const test::RawServer garbage({std::string("\0\xFF\xFE garbage\r\n\r\n", 14)});
-    const test::RawServer html({test::httpAnswer("<html><body>It works!</body></html>")});
+    const test::RawServer html({test::httpResponse("<html><body>It works!</body></html>")});
     const test::RawServer cut({"HTTP/1.1 200 OK\r\nContent-Length: 1000\r\n\r\n<CIM>"});
     const Ended ended =
         runAs(program(),
@@ -168,10 +168,11 @@ TEST_F(ManyServers, GarbageIsAFailureOfItsServer) {
                "show", "--no-header"});
     EXPECT_EQ(ended.status, 4);
     EXPECT_THAT(ended.out, testing::StartsWith(servers_[0]->url() + "\teth0 "));
-    EXPECT_THAT(ended.err, HasSubstr("  " + garbage.url() + ": no usable answer ("));
-    EXPECT_THAT(ended.err, HasSubstr("  " + html.url() +
-                                     ": the answer is no CIM-XML: element html where CIM belongs"));
-    EXPECT_THAT(ended.err, HasSubstr("  " + cut.url() + ": the answer is cut off"));
+    EXPECT_THAT(ended.err, HasSubstr("  " + garbage.url() + ": no usable response ("));
+    EXPECT_THAT(ended.err,
+                HasSubstr("  " + html.url() +
+                          ": the response is not CIM-XML: element html where CIM belongs"));
+    EXPECT_THAT(ended.err, HasSubstr("  " + cut.url() + ": the response is cut off"));
 }
 
 TEST_F(ManyServers, AListThatCannotBeReadIsNobodysFailure) {

@@ -45,8 +45,9 @@ TEST_F(Modify, TellsWhatAPropertyTakes) {
                      "65535\n"}));
     EXPECT_EQ(
         run({"modify", setting, "ConfigurationName"}),
-        (Ended{2, "",
-               "cimdhcp: \"ConfigurationName\" is no assignment of the form PROPERTY=VALUE\n"}));
+        (Ended{
+            2, "",
+            "cimdhcp: \"ConfigurationName\" is not an assignment of the form PROPERTY=VALUE\n"}));
     EXPECT_EQ(run({"modify", setting, "ElementName=a", "elementname=b"}),
               (Ended{2, "", "cimdhcp: elementname is given twice\n"}));
 }

@@ -154,7 +154,7 @@ TEST_F(OverviewCommands, AnExplainedTreeSaysWhereEachPropertyOfTheLiveMachineCam
     EXPECT_EQ(refused.status, 2);
     EXPECT_EQ(refused.out, "");
     EXPECT_EQ(refused.err,
-              "cimdhcp: only of the live machine it is known where properties came from\n");
+              "cimdhcp: the sources of properties are known for the live machine alone\n");
 }
 
 TEST_F(OverviewCommands, ClassesListsWhatIsServed) {

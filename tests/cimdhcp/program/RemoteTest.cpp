@@ -272,7 +272,7 @@ TEST_F(Remote, PasswordsDoNotGoOverHttpToOtherMachines) {
     EXPECT_EQ(to({"--connect", "http://host.invalid"}),
               (Ended{3, "",
                      "cimdhcp: http://host.invalid: the password could be read on the way over "
-                     "http; use https, or --insecure if nobody listens\n"}));
+                     "http; use https, or --insecure if no one can listen\n"}));
     const Ended insecure = to({"--connect", "http://host.invalid", "--insecure"});
     EXPECT_THAT(insecure.err, StartsWith("cimdhcp: warning: --insecure: "));
     EXPECT_THAT(insecure.err, HasSubstr("there is no address for the name host.invalid"));
@@ -291,8 +291,8 @@ TEST_F(Remote, TlsIsVerified) {
     EXPECT_EQ(ask({"--cacert", file, "show", "--count"}), (Ended{0, "2\n", ""}));
     EXPECT_EQ(ask({"--insecure", "show", "--count"}),
               (Ended{0, "2\n",
-                     "cimdhcp: warning: --insecure: nobody vouches that the servers are who they "
-                     "say, and passwords may be sent unencrypted\n"}));
+                     "cimdhcp: warning: --insecure: the identity of the servers is not checked, "
+                     "and passwords may be sent unencrypted\n"}));
     const std::string missing = directory() / "missing.pem";
     EXPECT_EQ(ask({"--cacert", missing, "show"}),
               (Ended{3, "", "cimdhcp: " + missing + ": No such file or directory\n"}));

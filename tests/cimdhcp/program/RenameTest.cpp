@@ -136,7 +136,7 @@ TEST_F(Rename, FindsOutThatItDidNotTakeEffect) {
     EXPECT_EQ(run({"rename", "eth0", "office"}),
               (Ended{1, "",
                      "cimdhcp: the configuration name of eth0 is still \"\": " +
-                         configuration("eth0") + " is no regular file\n"}));
+                         configuration("eth0") + " is not a regular file\n"}));
 }
 
 TEST_F(Rename, RefusesInterfacesThatCannotHaveAFile) {

@@ -60,15 +60,15 @@ TEST_F(Usage, ATreeThatCannotBeReadIsStatusThree) {
     const Ended notATree = run({"show"});
     EXPECT_EQ(notATree.status, 3);
     EXPECT_EQ(notATree.out, "");
-    EXPECT_EQ(notATree.err.substr(0, 62 + tree().size()),
-              "cimdhcp: " + tree() + ": this JSON is no instrumentation tree (the system lo");
+    EXPECT_EQ(notATree.err.substr(0, 66 + tree().size()),
+              "cimdhcp: " + tree() + ": this JSON is not an instrumentation tree (the system lo");
     // It does not matter how the tree was named.
     EXPECT_EQ(plain({"show"}, {{"ZR_INSTRUMENTATION_TREE", missing}}).status, 3);
 }
 
 TEST_F(Usage, ADataDirectoryThatIsNoneIsStatusThree) {
     EXPECT_EQ(plain({"--data-dir", tree(), "show"}),
-              (Ended{3, "", "cimdhcp: " + tree() + ": is no directory\n"}));
+              (Ended{3, "", "cimdhcp: " + tree() + ": is not a directory\n"}));
 }
 
 TEST_F(Usage, UnusableSettingsAreTold) {

@@ -2,7 +2,7 @@
 
 #include <gtest/gtest.h>
 
-#include "client/Failure.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 namespace {
@@ -31,6 +31,24 @@ TEST(Columns, SortByWhatTheyShow) {
               "b  10\n"
               "c  10\n");
     EXPECT_THROW(sortBy("other", columns, rows), Failure);
+}
+
+TEST(ColumnName, MayBeWrittenAsOptionsAre) {
+    const std::vector<std::string> names{"STATE", "CONFIGURATION NAME"};
+    EXPECT_EQ(columnNamed("state", names), 0U);
+    EXPECT_EQ(columnNamed("configuration-name", names), 1U);
+    EXPECT_EQ(columnNamed("Configuration_Name", names), 1U);
+}
+
+TEST(ColumnName, IsToldWhatThereIsWhenItIsWrong) {
+    try {
+        static_cast<void>(columnNamed("size", {"STATE", "ADDRESS"}));
+        ADD_FAILURE() << "accepted";
+    } catch (const Failure& failure) {
+        EXPECT_EQ(failure.status(), ExitStatus::usage);
+        EXPECT_STREQ(failure.what(),
+                     "--sort: there is no column \"size\"; there are: STATE, ADDRESS");
+    }
 }
 
 }  // namespace

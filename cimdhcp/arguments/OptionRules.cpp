@@ -1,0 +1,112 @@
+#include "arguments/OptionRules.h"
+
+#include <stdexcept>
+#include <string>
+#include <utility>
+#include <variant>
+
+#include "text/Failure.h"
+
+namespace cimdhcp {
+
+namespace {
+
+template <typename... Kinds>
+bool isOneOf(const Command& command) noexcept {
+    return (std::holds_alternative<Kinds>(command) || ...);
+}
+
+/// Whether the result of the command is a list, which can be sorted and counted.
+bool givesList(const Command& command) noexcept {
+    return asksClient(command) &&
+           !isOneOf<RenameCommand, GraphCommand, GetCommand, ModifyCommand>(command);
+}
+
+bool hasMofForm(const Command& command) noexcept {
+    return asksClient(command) &&
+           !isOneOf<ShowCommand, RenameCommand, GraphCommand, ClassesCommand>(command);
+}
+
+[[noreturn]] void refuse(const std::string& reason) {
+    throw Failure(ExitStatus::usage, reason);
+}
+
+void checkServers(const CommandLine& line) {
+    const Options& options = line.options;
+    if (!options.remote()) {
+        const bool given = options.credentials || options.caCertificate || options.insecure;
+        if (given) {
+            refuse(
+                "--credentials, --cacert and --insecure are about servers; name "
+                "one with --connect, or several with --hosts");
+        }
+        return;
+    }
+    if (!asksClient(line.command)) {
+        refuse(
+            "this command is about this machine alone; --connect and --hosts are "
+            "not for it");
+    }
+    if (options.tree || options.dataDir) {
+        refuse(
+            "--tree and --data-dir are about this machine; they cannot be given "
+            "with --connect or --hosts");
+    }
+    const auto* const rename = std::get_if<RenameCommand>(&line.command);
+    if (rename != nullptr && rename->create) {
+        refuse("--create cannot make files on other machines");
+    }
+}
+
+void checkFormat(const CommandLine& line) {
+    const Format format = line.options.format;
+    if (format == Format::json && std::holds_alternative<GraphCommand>(line.command)) {
+        refuse(
+            "a graph has no JSON output; it is in Graphviz' language, or with --svg "
+            "drawn");
+    }
+    if (format == Format::mof && !hasMofForm(line.command)) {
+        refuse("this command has no MOF output; use --format table or json");
+    }
+}
+
+void checkLimits(const Command& command) {
+    if (const auto* const serve = std::get_if<ServeCommand>(&command)) {
+        try {
+            serve->limits.check();
+        } catch (const std::invalid_argument& error) {
+            refuse(std::string("--") + error.what());
+        }
+    }
+}
+
+}  // namespace
+
+bool asksClient(const Command& command) noexcept {
+    return !isOneOf<TreeCommand, ServeCommand, UserAddCommand, CheckCommand>(command);
+}
+
+void completeCommandLine(CommandLine& line) {
+    Options& options = line.options;
+    std::string& nameSpace = options.nameSpace;
+    nameSpace.erase(0, nameSpace.find_first_not_of('/'));
+    nameSpace.erase(nameSpace.find_last_not_of('/') + 1);
+    if (nameSpace.empty()) {
+        refuse("--namespace needs a name, such as root/cimv2");
+    }
+    for (const auto& [name, value] :
+         {std::pair{"--tree", &options.tree}, std::pair{"--data-dir", &options.dataDir}}) {
+        if (*value && (*value)->empty()) {
+            refuse(std::string(name) + " needs a name");
+        }
+    }
+    checkLimits(line.command);
+    checkServers(line);
+    if ((options.sort || options.count) && !givesList(line.command)) {
+        refuse("the result of this command is not a list: there is nothing to " +
+               std::string(options.sort ? "sort" : "count"));
+    }
+    checkFormat(line);
+}
+
+}  // namespace cimdhcp

@@ -1,0 +1,25 @@
+#pragma once
+
+#include "arguments/CommandLine.h"
+#include "cimom/Cim.h"
+#include "client/Client.h"
+#include "client/Response.h"
+
+namespace cimdhcp {
+
+/// One CIM operation that was carried out, whatever the status of its response.
+struct CimOperation {
+    cimom::ObjectPath path;  ///< of the class or instance that was asked for
+    Response response;
+};
+
+// The commands that are one CIM operation each. They throw Failure when their
+// arguments cannot be understood.
+[[nodiscard]] CimOperation carryOut(const NamesCommand& command, Client& client);
+[[nodiscard]] CimOperation carryOut(const InstancesCommand& command, Client& client);
+[[nodiscard]] CimOperation carryOut(const GetCommand& command, Client& client);
+[[nodiscard]] CimOperation carryOut(const ModifyCommand& command, Client& client);
+[[nodiscard]] CimOperation carryOut(const AssociatorsCommand& command, Client& client);
+[[nodiscard]] CimOperation carryOut(const ReferencesCommand& command, Client& client);
+
+}  // namespace cimdhcp

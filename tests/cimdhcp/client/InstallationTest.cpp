@@ -1,0 +1,61 @@
+#include "client/Installation.h"
+
+#include <gtest/gtest.h>
+
+#include <filesystem>
+
+#include "kit/Files.h"
+#include "kit/TemporaryDirectory.h"
+#include "text/Failure.h"
+
+namespace cimdhcp {
+namespace {
+
+namespace fs = std::filesystem;
+using ZR::Testing::TemporaryDirectory;
+using ZR::Testing::writeFile;
+
+template <typename Find>
+std::string refusal(Find&& find) {
+    try {
+        static_cast<void>(std::forward<Find>(find)());
+        return "found";
+    } catch (const Failure& failure) {
+        EXPECT_EQ(failure.status(), ExitStatus::notLoaded);
+        return failure.what();
+    }
+}
+
+TEST(Installations, BeginWithTheOneOfTheExecutable) {
+    const auto places = installations("/opt/dhcp/bin/cimdhcp");
+    ASSERT_EQ(places.size(), 2U);
+    EXPECT_EQ(places[0].schema, "/opt/dhcp/share/dhcp-client-provider/schema");
+    EXPECT_EQ(places[0].registrations, places[0].schema);
+    EXPECT_EQ(places[0].providers.back(), "/opt/dhcp/lib/cmpi");
+    EXPECT_TRUE(places[1].schema.is_absolute());
+    EXPECT_EQ(places[1].registrations, places[1].schema);
+}
+
+TEST(RegistrationFiles, AreSortedByName) {
+    const TemporaryDirectory directory;
+    for (const char* name : {"b.registration", "a.registration", "c.mof"}) {
+        writeFile(directory / name, "");
+    }
+    EXPECT_EQ(registrationFiles(directory.path()),
+              (std::vector<fs::path>{directory / "a.registration", directory / "b.registration"}));
+}
+
+TEST(RegistrationFiles, MustBeThere) {
+    const TemporaryDirectory directory;
+    EXPECT_EQ(refusal([&] { return registrationFiles(directory.path()); }),
+              directory.path().string() + ": no *.registration file is in it");
+    EXPECT_EQ(refusal([&] { return registrationFiles(directory / "missing"); }),
+              directory / "missing" + ": No such file or directory");
+}
+
+TEST(ExecutableFile, IsThisTest) {
+    EXPECT_EQ(executableFile().filename(), "cimdhcp_test");
+}
+
+}  // namespace
+}  // namespace cimdhcp
