@@ -1,7 +1,8 @@
 #!/usr/bin/env bash
 # Makes the Debian packages, lets lintian read them, and installs, uses and purges them
 # in a root of their own: the machine's, with everything that is written going to a
-# file system in memory, which ends with the test.
+# file system in memory, which ends with the test. Packages that the machine itself has
+# installed, and what they keep, are taken out of that root first.
 # Usage: packages.sh BUILD_DIRECTORY TREE
 set -euo pipefail
 
@@ -22,6 +23,12 @@ done
 lintian --allow-root --fail-on error --suppress-tags initial-upload-closes-no-bugs "${packages[@]}"
 
 cp "$tree" "$directory/tree.json"
+# What is in the way on a machine where the packages are installed.
+cat >"$directory/clear" <<'TEXT'
+set -euo pipefail
+dpkg --purge cimdhcp cmpi-dhcp-client-neighbours cmpi-dhcp-client-provider dhcp-client-provider-schema
+rm -rf /etc/zr /var/lib/dhcp-client-provider
+TEXT
 cat >"$directory/inside" <<'TEXT'
 set -euo pipefail
 cd /packages
@@ -61,15 +68,23 @@ mount -t overlay none -o "lowerdir=/,upperdir=$directory/memory/upper,workdir=$d
     "$directory/memory/root"
 mkdir "$directory/memory/root/packages"
 cp "$directory"/packages/*.deb "$directory/memory/root/packages"
-cp "$directory/inside" "$directory/tree.json" "$directory/memory/root/"
+cp "$directory/clear" "$directory/inside" "$directory/tree.json" "$directory/memory/root/"
 mount -t proc none "$directory/memory/root/proc"
 mount --bind /dev "$directory/memory/root/dev"
+# All that was written, and the directories of the packages.
+written() {
+    (cd "$directory/memory/upper" &&
+        find . -mindepth 1 \( ! -type d -o -name '*dhcp-client*' -o -name zr \) | LC_ALL=C sort)
+}
+chroot "$directory/memory/root" /bin/bash /clear >"$directory/cleared" 2>&1 || {
+    cat "$directory/cleared"
+    exit 1
+}
+written >"$directory/before"
 chroot "$directory/memory/root" /bin/bash /inside
-cd "$directory/memory/upper"
 echo "== left behind"
-find . -mindepth 1 ! -type d | LC_ALL=C sort | grep -Ev \
-    '^\./(packages/|inside$|tree.json$|var/(lib/dpkg|log|cache)/|etc/ld.so.cache|usr/share/info/dir)' || true
-find . -type d \( -name '*dhcp-client*' -o -name zr \) | LC_ALL=C sort
+written | LC_ALL=C comm -13 "$directory/before" - |
+    grep -Ev '^\./(var/(lib/dpkg|log|cache)/|etc/ld.so.cache|usr/share/info/dir)' || true
 TEXT
 mkdir "$directory/memory"
 unshare --mount bash "$directory/outside" "$directory" >"$directory/output" 2>"$directory/errors" || {
