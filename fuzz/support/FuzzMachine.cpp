@@ -33,20 +33,20 @@ cimom::ObjectManager& machine() {
     return manager;
 }
 
-cimom::wbem::XmlElement validAnswer(const std::string& xml) {
+cimom::wbem::XmlElement validResponse(const std::string& xml) {
     constexpr std::size_t depth = 64;
     cimom::wbem::XmlElement element;
     try {
         element = cimom::wbem::readXml(xml, depth);
     } catch (const cimom::wbem::XmlError& error) {
         static_cast<void>(std::fprintf(stderr, "%s\n%s\n", error.what(), xml.c_str()));
-        require(false, "an answer is well-formed XML");
+        require(false, "a response is well-formed XML");
     }
     const auto violations = cimom::test::violations(element);
     for (const std::string& violation : violations) {
         static_cast<void>(std::fprintf(stderr, "%s\n%s\n", violation.c_str(), xml.c_str()));
     }
-    require(violations.empty(), "an answer has the structure of DSP0203");
+    require(violations.empty(), "a response has the structure of DSP0203");
     return element;
 }
 

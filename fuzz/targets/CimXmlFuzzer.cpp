@@ -9,9 +9,9 @@ namespace {
 using cimom::wbem::Call;
 using cimom::wbem::XmlElement;
 
-/// The message that an answer is.
-XmlElement messageOf(const std::string& answer) {
-    return fuzz::validAnswer(answer).children.at(0);
+/// The message that a response is.
+XmlElement messageOf(const std::string& response) {
+    return fuzz::validResponse(response).children.at(0);
 }
 
 }  // namespace
@@ -34,7 +34,7 @@ int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
         const XmlElement message = messageOf(answer);
         const std::string* const id = message.attribute("ID");
         fuzz::require(id != nullptr && *id == call.messageId,
-                      "an answer bears the request's number");
+                      "a response bears the request's number");
     }
     return 0;
 }

@@ -18,7 +18,7 @@ void checkInstance(const XmlElement& element) {
     const cimom::Instance instance = cimom::wbem::readInstance(element);
     std::string xml;
     cimom::wbem::writeInstance(xml, instance, nullptr);
-    const XmlElement written = fuzz::validAnswer(xml);
+    const XmlElement written = fuzz::validResponse(xml);
     if (hasBareKey(xml)) {
         return;
     }
@@ -32,7 +32,7 @@ void checkPath(const XmlElement& element) {
     const cimom::ObjectPath path = cimom::wbem::readPath(element);
     std::string xml;
     cimom::wbem::writeReference(xml, path);
-    const XmlElement written = fuzz::validAnswer(xml);
+    const XmlElement written = fuzz::validResponse(xml);
     if (hasBareKey(xml)) {
         return;
     }

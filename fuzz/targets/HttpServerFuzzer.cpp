@@ -1,7 +1,7 @@
 // Bytes that a stranger sends to the whole server: HTTP, CIM-XML and the real provider.
-// Everything is sent at once, and all answers are read until the connection ends, or
+// Everything is sent at once, and all responses are read until the connection ends, or
 // until nothing more comes: a request that is not whole has half a minute to become so.
-// Whatever came, the next client is answered.
+// Whatever came, the next client gets a response.
 #include <arpa/inet.h>
 #include <netinet/in.h>
 #include <poll.h>
@@ -52,7 +52,7 @@ ZR::UniqueFd connected() {
 }
 
 /// Whether something comes within the time. The fuzzer's own timer interrupts the
-/// waiting now and then, which is no silence.
+/// waiting now and then, which is not silence.
 bool comes(int fd, int milliseconds) {
     pollfd readable{fd, POLLIN, 0};
     int ready = 0;
@@ -64,17 +64,17 @@ bool comes(int fd, int milliseconds) {
 
 /// What the server sends until it ends the connection or is silent for the time.
 std::string received(int fd, int milliseconds) {
-    std::string answers;
+    std::string responses;
     std::array<char, 65536> piece{};
     for (;;) {
         if (!comes(fd, milliseconds)) {
-            return answers;
+            return responses;
         }
         const ssize_t size = ::recv(fd, piece.data(), piece.size(), 0);
         if (size <= 0) {
-            return answers;  // its end, or a reset for what the server would not read
+            return responses;  // its end, or a reset for what the server would not read
         }
-        answers.append(piece.data(), static_cast<std::size_t>(size));
+        responses.append(piece.data(), static_cast<std::size_t>(size));
     }
 }
 
@@ -145,14 +145,14 @@ std::optional<std::string> takeChunks(std::string_view& text) {
     }
 }
 
-/// Takes one answer and checks it; false when it is not whole, or ends with the connection.
-bool takeAnswer(std::string_view& text) {
+/// Takes one response and checks it; false when it is not whole, or ends with the connection.
+bool takeResponse(std::string_view& text) {
     const auto status = takeLine(text);
     if (!status) {
         return false;
     }
     const bool known = status->starts_with("HTTP/1.1 ") || status->starts_with("HTTP/1.0 ");
-    fuzz::require(known && status->size() >= 12, "an answer begins with a status");
+    fuzz::require(known && status->size() >= 12, "a response begins with a status");
     const std::string_view code = status->substr(9, 3);
     std::map<std::string, std::string, LessName> headers;
     for (;;) {
@@ -182,22 +182,22 @@ bool takeAnswer(std::string_view& text) {
         return false;
     }
     if (body && code == "200") {
-        fuzz::validAnswer(*body);
+        fuzz::validResponse(*body);
     }
     return body.has_value();
 }
 
-/// Sends bytes and checks the answers; false when there was none.
+/// Sends bytes and checks the responses; false when there was none.
 bool ask(std::string_view bytes, int milliseconds) {
     const ZR::UniqueFd fd = connected();
     send(fd.get(), bytes);
     // Fails where the server was faster.
     static_cast<void>(::shutdown(fd.get(), SHUT_WR));
-    const std::string answers = received(fd.get(), milliseconds);
-    std::string_view rest = answers;
-    while (takeAnswer(rest)) {
+    const std::string responses = received(fd.get(), milliseconds);
+    std::string_view rest = responses;
+    while (takeResponse(rest)) {
     }
-    return !answers.empty();
+    return !responses.empty();
 }
 
 }  // namespace
@@ -210,7 +210,7 @@ int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
     static const std::string ending = "\r\n\r\n0\r\n\r\n" + std::string(1500, ' ') + "\r\n\r\n";
     if (!ask(std::string(fuzz::text(data, size)) + ending, shortTime)) {
         fuzz::require(ask("GET / HTTP/1.1\r\nHost: h\r\nConnection: close\r\n\r\n", longTime),
-                      "the next client is answered");
+                      "the next client gets a response");
     }
     return 0;
 }

@@ -1,4 +1,4 @@
-// MOF of a schema that somebody else wrote.
+// MOF of a schema that others wrote.
 #include <algorithm>
 
 #include "Input.h"

@@ -50,16 +50,16 @@ std::optional<CimHeaders> headersOf(std::string_view text, const cimom::wbem::Li
     }
 }
 
-std::string answerTo(const Call& call, const cimom::wbem::Limits& limits) {
+std::string responseTo(const Call& call, const cimom::wbem::Limits& limits) {
     cimom::wbem::Operations operations(fuzz::machine(), limits,
                                        [](const cimom::wbem::Modification&) {});
-    auto answer = operations.perform(call, {std::nullopt, "192.0.2.1", true, nullptr});
+    auto response = operations.perform(call, {std::nullopt, "192.0.2.1", true, nullptr});
     std::string xml;
     constexpr std::size_t piece = 64;
-    while (!answer.ended()) {
+    while (!response.ended()) {
         const std::size_t before = xml.size();
-        answer.write(xml, before + piece);
-        fuzz::require(answer.ended() || xml.size() >= before + piece, "an answer goes on");
+        response.write(xml, before + piece);
+        fuzz::require(response.ended() || xml.size() >= before + piece, "a response goes on");
     }
     return xml;
 }
@@ -84,10 +84,10 @@ int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
             }
         }
         // Without good headers, too: the body is what an input is about most often.
-        const auto element = fuzz::validAnswer(answerTo(call, limits));
+        const auto element = fuzz::validResponse(responseTo(call, limits));
         const std::string* const id = element.children.at(0).attribute("ID");
         fuzz::require(id != nullptr && *id == call.messageId,
-                      "an answer bears the request's number");
+                      "a response bears the request's number");
     } catch (const cimom::wbem::HttpFailure& failure) {
         checkRefusal(failure);
     } catch (const cimom::wbem::NotValid& error) {

@@ -39,7 +39,7 @@ void run(corpus::Target* target, const fs::path& file) {
     if (!stream) {
         throw std::runtime_error(file.string() + ": cannot be read");
     }
-    // Of its own size, so that a byte behind its end is nobody's.
+    // Of its own size, so that a sanitizer sees a step beyond its end.
     const std::vector<std::uint8_t> input(content.begin(), content.end());
     // Should it end the process, its name stands last.
     std::cerr << file.string() << '\n';
