@@ -5,7 +5,7 @@
 #include <filesystem>
 
 #include "client/Failure.h"
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"
 
 namespace cimdhcp {

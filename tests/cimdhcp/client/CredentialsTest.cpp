@@ -7,7 +7,7 @@
 
 #include "client/Failure.h"
 #include "kit/ChildProcess.h"
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"
 
 namespace cimdhcp {

@@ -6,7 +6,7 @@
 #include <sstream>
 
 #include "client/Failure.h"
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"
 
 namespace cimdhcp {
