@@ -45,6 +45,7 @@ using ZR::Testing::LogCapture;
 using ZR::Testing::readFile;
 using ZR::Testing::TemporaryDirectory;
 using ZR::Testing::writeFile;
+using ZR::Testing::Printing::PrintTo;
 
 /// What a rewrite in place must keep of a file, apart from its content.
 struct Identity {
