@@ -2,9 +2,9 @@
 // discarded: each class enumerated, and walked from one element of each end, at 10,
 // 100 and 1,000 interfaces. The far ends are served by the neighbours' library.
 //
-// Some classes are prescribed to walk the interfaces anew for each object of an
-// enumeration, which so grows with their square. Below Google Benchmark's figures
-// stands how each request grew, and what one step of each prescribed walk cost.
+// Some classes walk the interfaces anew for each object of an enumeration: clients rely
+// on that walk, although it grows with the square. Below Google Benchmark's figures
+// stands how each request grew, and what one step of each such walk cost.
 
 #include <benchmark/benchmark.h>
 
@@ -180,7 +180,7 @@ void printGrowth(const RememberingReporter& reporter) {
                         costs.at(100), costs.at(1000), std::log10(costs.at(1000) / costs.at(100)));
         }
     }
-    std::printf("\n%-75s %12s\n", "prescribed walk", "step [ns]");
+    std::printf("\n%-75s %12s\n", "walk that clients rely on", "step [ns]");
     for (const auto& [name, nanoseconds] : reporter.steps) {
         std::printf("%-75s %12.0f\n", name.c_str(), nanoseconds);
     }

@@ -47,7 +47,7 @@ Machine::Machine() : directory_("/tmp/provider-bench-XXXXXX") {
 }
 
 Machine::~Machine() {
-    std::error_code ignored;  // a directory that stays in /tmp harms nobody
+    std::error_code ignored;  // a directory that stays in /tmp does no harm
     std::filesystem::remove_all(directory_, ignored);
 }
 

@@ -1,6 +1,6 @@
 // What an endpoint instance costs through the provider's function table, with
 // tracing discarded, beside the floor: the same instances made from a plain vector
-// through the same broker. Both answer a request of the broker's, whose path and
+// through the same broker. Both serve a request of the broker's, whose path and
 // context are made for each, and hand their objects to a result that only counts.
 //
 // Prints Google Benchmark's figures and, below them, the ratios of the same run.

@@ -3,7 +3,7 @@
 // writes a profile of its own, named after it, so that the instructions of each can be
 // counted exactly; bench/instructions compares them with what they were.
 //
-// Run without valgrind it only checks that every request is answered.
+// Run without valgrind it only checks that every request succeeds.
 
 #include <valgrind/callgrind.h>
 
@@ -52,11 +52,11 @@ template <typename Request>
 auto measure(const char* name, Request&& request) {
     CALLGRIND_ZERO_STATS;
     CALLGRIND_START_INSTRUMENTATION;
-    auto answer = request();
+    auto result = request();
     CALLGRIND_STOP_INSTRUMENTATION;
     CALLGRIND_DUMP_STATS_AT(name);
     std::puts(name);
-    return answer;
+    return result;
 }
 
 cimom::ObjectPath classPath(const char* className) {
@@ -80,7 +80,7 @@ void runAll() {
                    }),
            interfaces);
 
-    // Every library is loaded and every road is warm before the rest is counted.
+    // Every library is loaded and every code path is warm before the rest is counted.
     const cimom::ObjectPath endpoint = pathAt(*manager, "QVXZR_DHCPProtocolEndpoint", 50);
     const cimom::ObjectPath setting = pathAt(*manager, "QVXZR_DHCPSettingData", 50);
     const cimom::ObjectPath system = pathAt(*manager, "QVXZR_ComputerSystem", 0);

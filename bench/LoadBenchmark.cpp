@@ -1,5 +1,5 @@
-// How soon a freshly loaded library answers, and what it keeps: from opening the
-// library to the answer of its first request on a live machine of four interfaces,
+// How soon a freshly loaded library responds, and what it keeps: from opening the
+// library to the response to its first request on a live machine of four interfaces,
 // beside the floor, a library opened and closed that does nothing. Needs root: the
 // links lie in a network namespace of its own.
 //
@@ -79,14 +79,14 @@ void bareLoad(benchmark::State& state) {
     }
 }
 
-void firstAnswer(benchmark::State& state, long growth) {
+void firstResponse(benchmark::State& state, long growth) {
     for (auto _ : state) {
         state.PauseTiming();
         auto manager = std::make_unique<cimom::ObjectManager>(configuration());
         state.ResumeTiming();
-        const bool answered = ask(*manager);
+        const bool complete = ask(*manager);
         state.PauseTiming();
-        if (!answered) {
+        if (!complete) {
             state.SkipWithError("the four interfaces do not show");
         }
         manager.reset();
@@ -128,8 +128,9 @@ int main(int argc, char** argv) {
     enterMachineOfFour();
     const long growth = growthOfFirstLoad();
     benchmark::RegisterBenchmark("bare load", bareLoad)->Unit(benchmark::kMicrosecond);
-    benchmark::RegisterBenchmark("load to first answer",
-                                 [growth](benchmark::State& state) { firstAnswer(state, growth); })
+    benchmark::RegisterBenchmark(
+        "load to first response",
+        [growth](benchmark::State& state) { firstResponse(state, growth); })
         ->Unit(benchmark::kMicrosecond)
         ->UseRealTime();
     benchmark::Initialize(&argc, argv);
@@ -139,9 +140,9 @@ int main(int argc, char** argv) {
     Reporter reporter;
     benchmark::RunSpecifiedBenchmarks(&reporter);
     const double floor = reporter.time("bare load");
-    const double answer = reporter.time("load to first answer/real_time");
-    std::printf("\nload to first answer: %.0f us, %.1f of a bare load (%.0f us)\n", answer,
-                answer / floor, floor);
+    const double response = reporter.time("load to first response/real_time");
+    std::printf("\nload to first response: %.0f us, %.1f of a bare load (%.0f us)\n", response,
+                response / floor, floor);
     std::printf("resident memory grew by %ld kB with the library and its first request\n", growth);
     return 0;
 }

@@ -1,5 +1,5 @@
 // The WBEM server over loopback: requests per second and their latency with 1, 8
-// and 64 clients, on machines of 4 and 1,000 interfaces; the first byte of an answer;
+// and 64 clients, on machines of 4 and 1,000 interfaces; the first byte of a response;
 // and instances per second of a long result.
 #include <arpa/inet.h>
 #include <benchmark/benchmark.h>
@@ -58,7 +58,7 @@ std::string request(const std::string& method, std::string_view body,
            "\r\nContent-Length: " + std::to_string(body.size()) + "\r\n\r\n" + std::string(body);
 }
 
-/// A client on one connection, which only looks for the end of an answer.
+/// A client on one connection, which only looks for the end of a response.
 class Client {
   public:
     explicit Client(std::uint16_t port)
@@ -75,7 +75,7 @@ class Client {
     Client(const Client&) = delete;
     Client& operator=(const Client&) = delete;
 
-    /// The bytes of the answer. Its last element is the same for all answers.
+    /// The bytes of the response. Its last element is the same for all responses.
     std::size_t ask(const std::string& bytes) {
         if (::send(fd_, bytes.data(), bytes.size(), MSG_NOSIGNAL) !=
             static_cast<ssize_t>(bytes.size())) {
@@ -95,18 +95,18 @@ class Client {
             total += static_cast<std::size_t>(got);
             const std::string_view piece(buffer_.data(), static_cast<std::size_t>(got));
             tail.append(piece.substr(piece.size() - std::min(piece.size(), chunkEnd.size())));
-            if (tail.ends_with(chunkEnd) || (total < longAnswer && tail.ends_with(end))) {
+            if (tail.ends_with(chunkEnd) || (total < longResponse && tail.ends_with(end))) {
                 return total;
             }
             tail.erase(0, tail.size() - std::min(tail.size(), chunkEnd.size()));
         }
     }
 
-    /// When the last answer began to arrive.
+    /// When the last response began to arrive.
     [[nodiscard]] Clock::time_point firstByte() const noexcept { return firstByte_; }
 
   private:
-    static constexpr std::size_t longAnswer = 60000;
+    static constexpr std::size_t longResponse = 60000;
     Clock::time_point firstByte_;
     int fd_;
     std::vector<char> buffer_;
@@ -217,7 +217,7 @@ void enumerateEndpoints(benchmark::State& state) {
                 static_cast<std::size_t>(state.range(1)), interfaces > 100 ? 5 : 200);
 }
 
-/// From sending a request to the first byte of its answer, which counts as the time.
+/// From sending a request to the first byte of its response, which counts as the time.
 void firstByteOfFourEndpoints(benchmark::State& state) {
     const Served served(machine(4));
     const std::string bytes = request("EnumerateInstances", endpointsBody, "root/cimv2");

@@ -92,14 +92,15 @@ if(ZR_SANITIZERS)
 endif()
 
 # The headers that every test includes, compiled once: most of a test's compile
-# time would go into them.
+# time would go into them. With the printers, so that no comparison shows mere bytes.
 function(zr_test_headers)
     file(CONFIGURE OUTPUT ${CMAKE_BINARY_DIR}/test_headers.cpp CONTENT "int main() {}\n")
     add_executable(test_headers ${CMAKE_BINARY_DIR}/test_headers.cpp)
     target_link_libraries(test_headers PRIVATE zr_options test_options GTest::gtest GTest::gmock)
     target_compile_definitions(test_headers PRIVATE ZR_SOURCE_DIR="${PROJECT_SOURCE_DIR}"
                                ZR_BINARY_DIR="${PROJECT_BINARY_DIR}")
-    target_precompile_headers(test_headers PRIVATE <gmock/gmock.h> <gtest/gtest.h>)
+    target_precompile_headers(test_headers PRIVATE
+        <gmock/gmock.h> <gtest/gtest.h> ${PROJECT_SOURCE_DIR}/tests/kit/Printers.h)
 endfunction()
 
 # zr_test(NAME SOURCES file... [LINKS target...] [LABELS label...] [ENVIRONMENT NAME=value...]

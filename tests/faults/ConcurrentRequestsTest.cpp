@@ -12,7 +12,7 @@
 #include <thread>
 #include <vector>
 
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 #include "kit/ProviderHost.h"
 #include "kit/Script.h"
 #include "kit/TreeMachine.h"
@@ -45,7 +45,7 @@ class Concurrency : public ::testing::Test {
         machine_.enter(0);
     }
 
-    /// What a request answers when nobody else asks, in each state that there will be.
+    /// The response to a request without others beside it, in each state that there will be.
     void askSerially(ProviderHost& host) {
         for (unsigned state = 0; state < states; ++state) {
             machine_.enter(state);
@@ -66,8 +66,7 @@ class Concurrency : public ::testing::Test {
             const ScriptAnswer answer = host.run(script()[i]);
             if (std::find(serial_[i].begin(), serial_[i].end(), answer) == serial_[i].end()) {
                 const std::lock_guard lock(mutex_);
-                ADD_FAILURE() << script()[i].name << " had no state in which it answers\n"
-                              << answer;
+                ADD_FAILURE() << script()[i].name << " had no state with the response\n" << answer;
             }
         }
     }

@@ -11,7 +11,8 @@
 #include <vector>
 
 #include "kit/Allocations.h"
-#include "kit/Files.h"
+#include "kit/FileContent.h"
+#include "kit/OpenDescriptors.h"
 #include "kit/SystemCalls.h"
 
 namespace test {
@@ -20,6 +21,7 @@ namespace {
 using ZR::Testing::Allocations;
 using ZR::Testing::Call;
 using ZR::Testing::CallOrigin;
+using ZR::Testing::openDescriptors;
 using ZR::Testing::SystemCalls;
 
 constexpr const char* oldContent = "# eth0\nBOOTPROTO=dhcp\nCONFIG_NAME=old\nONBOOT=yes\n";
@@ -101,7 +103,7 @@ bool misinforms(Call call, int error) {
             return true;
         case EAGAIN:  // that nothing happened
             return call == Call::read || call == Call::recv;
-        case EINVAL:  // that it is no link, or nothing that can be read
+        case EINVAL:  // that it is not a link, or nothing that can be read
             return call == Call::open || call == Call::read || call == Call::readlink ||
                    call == Call::readlinkat;
         case EISDIR:
@@ -110,11 +112,6 @@ bool misinforms(Call call, int error) {
         default:
             return call == Call::access || call == Call::readlink || call == Call::readlinkat;
     }
-}
-
-std::size_t openDescriptors() {
-    const std::filesystem::directory_iterator all("/proc/self/fd");
-    return static_cast<std::size_t>(std::distance(begin(all), end(all)));
 }
 
 std::string errorText(int error) {
@@ -254,7 +251,8 @@ void FaultSweep::expectTruth(const ScriptRequest& request, const ScriptAnswer& a
     }
     const bool readsConfiguration = some && answer.objects.size() == usual.objects.size();
     EXPECT_TRUE(logged || readsConfiguration || (fault.ofMemory && isSilent(request)))
-        << "not a word in the log, and the answer is " << ::testing::PrintToString(answer.objects);
+        << "not a word in the log, and the response is "
+        << ::testing::PrintToString(answer.objects);
 }
 
 void FaultSweep::expectOneContent() {

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <array>
+#include <cstddef>
 #include <cstdint>
 #include <functional>
 #include <string>
@@ -14,10 +15,10 @@
 namespace test {
 
 /// Lets one thing go wrong in a request, at each place where it can, one after the
-/// other. What must hold of each answer: the process lives; the answer is complete, or
+/// other. What must hold of each response: the process lives; the response is complete, or
 /// what is missing is missing because of a failure that the log tells of; nothing in it
 /// is of a state that is over; a configuration file has its old content or its new one,
-/// whole; no descriptor and no memory is lost; and the next request is answered right.
+/// whole; no descriptor and no memory is lost; and the next request gets the right response.
 class FaultSweep {
   public:
     /// Whether the machine changes before each request, so that the request reads it.
@@ -28,12 +29,12 @@ class FaultSweep {
     FaultSweep(const FaultSweep&) = delete;
     FaultSweep& operator=(const FaultSweep&) = delete;
 
-    /// Each allocation that the provider makes for the request fails once. Answers how
+    /// Each allocation that the provider makes for the request fails once. Returns how
     /// many there were.
     unsigned failAllocations(const ScriptRequest& request);
 
     /// Each system call that it makes fails with each errno that its manual page tells
-    /// of; transfers are of half of the bytes, too. Answers how many failures there were.
+    /// of; transfers are of half of the bytes, too. Returns how many failures there were.
     unsigned failSystemCalls(const ScriptRequest& request);
 
   private:
@@ -71,7 +72,7 @@ class FaultSweep {
     ZR::Testing::CallOrigin origin_;
     unsigned state_ = 0;
     std::array<Usual, 2> usual_;
-    std::size_t descriptors_ = 0;
+    std::ptrdiff_t descriptors_ = 0;
 };
 
 }  // namespace test

@@ -3,7 +3,7 @@
 #include <cstdlib>
 #include <filesystem>
 
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 #include "kit/Namespaces.h"
 
 namespace test {

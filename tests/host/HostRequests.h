@@ -7,7 +7,7 @@
 #include "kit/StrictHost.h"
 
 /// Requests that are put to the embedded object manager and to the strict host alike,
-/// and their answers as text, so that the two can be compared.
+/// and their responses as text, so that the two can be compared.
 namespace strict {
 
 using Texts = std::vector<std::string>;

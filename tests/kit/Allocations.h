@@ -12,7 +12,7 @@ namespace ZR::Testing {
 class Allocations {
   public:
     /// Watches the allocations of this thread that come from the origin, and lets the
-    /// one of that number fail: `operator new` throws std::bad_alloc, the others answer
+    /// one of that number fail: `operator new` throws std::bad_alloc, the others return
     /// null. None is number 0. One at a time per thread.
     explicit Allocations(const CallOrigin& origin, unsigned failing = 0) noexcept;
     ~Allocations();

@@ -14,7 +14,7 @@ using Texts = std::vector<std::string>;
 /// object from the other. References are written in brackets, in the order of roles.
 std::string brief(const std::optional<cimom::ObjectPath>& path);
 
-/// All that an answer has, paths or instances.
+/// All that a response has, paths or instances.
 Texts briefs(const Host::Answer& answer);
 
 /// A path of the default namespace from its text, with this host's name for "@".

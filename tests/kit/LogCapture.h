@@ -7,7 +7,7 @@
 #include <string_view>
 #include <vector>
 
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"
 #include "tklogger/TKLogger.h"
 
@@ -49,14 +49,14 @@ inline LogRecord parseLogLine(std::string_view text) {
         const char* const end = digits.data() + digits.size();
         const auto result = std::from_chars(digits.data(), end, value);
         if (result.ec != std::errc{} || result.ptr != end) {
-            throw std::runtime_error("no number where one belongs: " + whole);
+            throw std::runtime_error("not a number where one belongs: " + whole);
         }
     };
     LogRecord record;
     record.time = field();
     constexpr std::string_view form = "2026-11-20T08:15:30.123456Z";
     if (record.time.size() != form.size() || record.time.back() != 'Z') {
-        throw std::runtime_error("no time where one belongs: " + whole);
+        throw std::runtime_error("not a time where one belongs: " + whole);
     }
     number(field(), record.level);
     record.category = field();
@@ -87,7 +87,7 @@ inline std::vector<LogRecord> parseLog(std::string_view text) {
 }
 
 /// Sends log and trace of this process to files of a test's own. At its end both
-/// roads keep nothing.
+/// channels keep nothing.
 class LogCapture {
   public:
     explicit LogCapture(int logLevel = 0, int traceLevel = 0) {

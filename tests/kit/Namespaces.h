@@ -15,7 +15,7 @@ namespace ZR::Live {
 /// no expectation failed in it; its messages appear among those of the test.
 [[nodiscard]] bool passesInNamespaces(unsigned seconds, const std::function<void()>& body);
 
-/// Runs a shell command and expects it to succeed; answers what it printed.
+/// Runs a shell command and expects it to succeed; returns what it printed.
 std::string run(const std::string& command);
 
 /// Another network namespace, held by a process, until the object goes.

@@ -120,7 +120,7 @@ ssize_t SystemCalls::reallySend(int fd, const void* bytes, std::size_t size) {
 
 namespace {
 
-/// Meets a call: answers the failure if it is due, else what the real one answers.
+/// Meets a call: returns the failure if it is due, else what the real one returns.
 template <typename Result, typename Real>
 Result meet(Call call, const void* returnAddress, Result failure, const Real& real) {
     if (SystemCalls* const watching = SystemCalls::watching(returnAddress)) {
@@ -148,7 +148,7 @@ ssize_t transfer(Call call, const void* returnAddress, std::size_t size, const R
     return real(size);
 }
 
-/// The same for what takes place whether it answers a failure or not.
+/// The same for what takes place whether it returns a failure or not.
 template <typename Real>
 int complete(Call call, const void* returnAddress, const Real& real) {
     SystemCalls* const watching = SystemCalls::watching(returnAddress);

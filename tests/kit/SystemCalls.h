@@ -76,14 +76,14 @@ class SystemCalls {
         return counts_.at(static_cast<std::size_t>(call));
     }
 
-    /// Answers in the place of the system, or calls it and changes what it said: given
+    /// Takes the place of the system, or calls it and changes its result: given
     /// the arguments, with errno as the caller will see it.
     using Receive = std::function<ssize_t(int fd, msghdr* message, int flags)>;
     void onReceive(Receive receive) { receive_ = std::move(receive); }
     using Send = std::function<ssize_t(int fd, const void* bytes, std::size_t size)>;
     void onSend(Send send) { send_ = std::move(send); }
 
-    /// The real thing, for those who answer.
+    /// The function of the system, for those that stand in its place.
     static ssize_t reallyReceive(int fd, msghdr* message, int flags);
     static ssize_t reallySend(int fd, const void* bytes, std::size_t size);
 

@@ -1,8 +1,15 @@
 #pragma once
 
+#include <fcntl.h>
+#include <sys/stat.h>
+
+#include <array>
 #include <cerrno>
+#include <cstdint>
 #include <cstdlib>
 #include <filesystem>
+#include <fstream>
+#include <stdexcept>
 #include <string>
 #include <string_view>
 #include <system_error>
@@ -20,7 +27,7 @@ class TemporaryDirectory {
         path_ = name;
     }
     ~TemporaryDirectory() {
-        std::error_code ignored;  // a left-over directory is no reason to fail
+        std::error_code ignored;  // a directory that stays behind fails no test
         std::filesystem::remove_all(path_, ignored);
     }
     TemporaryDirectory(const TemporaryDirectory&) = delete;
@@ -33,7 +40,38 @@ class TemporaryDirectory {
         return (path_ / name).string();
     }
 
+    // As the root directory of a machine: `below` begins with a slash.
+
+    [[nodiscard]] std::string path(std::string_view below) const {
+        return path_.string() + std::string(below);
+    }
+    /// Makes the directories on the way, too. Throws when the file cannot be written.
+    void write(std::string_view below, std::string_view content) const {
+        std::filesystem::create_directories(std::filesystem::path(path(below)).parent_path());
+        put(below, content, std::ios::trunc);
+    }
+    void append(std::string_view below, std::string_view content) const {
+        put(below, content, std::ios::app);
+    }
+    /// Sets when a file was last written, in seconds since the epoch.
+    void age(std::string_view below, std::int64_t seconds) const {
+        const timespec time{.tv_sec = seconds, .tv_nsec = 0};
+        const std::array<timespec, 2> times{time, time};
+        if (::utimensat(AT_FDCWD, path(below).c_str(), times.data(), 0) != 0) {
+            throw std::system_error(errno, std::generic_category(), path(below));
+        }
+    }
+
   private:
+    void put(std::string_view below, std::string_view content, std::ios::openmode mode) const {
+        std::ofstream file(path(below), std::ios::binary | mode);
+        file << content;
+        file.close();
+        if (!file) {
+            throw std::runtime_error("cannot write " + path(below));
+        }
+    }
+
     std::filesystem::path path_;
 };
 

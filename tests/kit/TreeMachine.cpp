@@ -4,7 +4,7 @@
 #include <filesystem>
 #include <nlohmann/json.hpp>
 
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 
 namespace test {
 namespace {

@@ -2,26 +2,10 @@
 
 #include <gtest/gtest.h>
 
-#include <ostream>
 #include <string>
 #include <vector>
 
 #include "kit/Tree.h"
-
-namespace ZR::DHCPClientNeighbours {
-
-// Found by the test library where the facts are.
-static std::ostream& operator<<(std::ostream& out, const ComputerFacts& facts) {
-    return out << facts.name << (facts.isServiceProcessor ? " (service processor)" : "");
-}
-
-static std::ostream& operator<<(std::ostream& out, const InterfaceFacts& facts) {
-    return out << facts.name << " of " << facts.systemName
-               << (facts.ofServiceProcessor ? " (service processor) " : " ") << facts.ipv4Address
-               << " from " << facts.addressSource;
-}
-
-}  // namespace ZR::DHCPClientNeighbours
 
 namespace {
 

@@ -8,7 +8,7 @@ namespace test {
 
 /// What a process holds at one time.
 struct Sample {
-    std::uint64_t requests = 0;     ///< answered so far
+    std::uint64_t requests = 0;     ///< served so far
     std::uint64_t residentKiB = 0;  ///< resident memory
     std::uint64_t descriptors = 0;  ///< open
 

@@ -4,7 +4,8 @@
 
 #include <filesystem>
 
-#include "kit/Files.h"
+#include "client/Failure.h"
+#include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"
 #include "text/Failure.h"
 

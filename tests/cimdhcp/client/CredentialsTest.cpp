@@ -6,7 +6,7 @@
 #include <unistd.h>
 
 #include "kit/ChildProcess.h"
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"
 #include "text/Failure.h"
 

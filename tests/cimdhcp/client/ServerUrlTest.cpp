@@ -5,7 +5,8 @@
 
 #include <sstream>
 
-#include "kit/Files.h"
+#include "client/Failure.h"
+#include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"
 #include "text/Failure.h"
 

@@ -2,7 +2,7 @@
 
 #include <gtest/gtest.h>
 
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"
 
 namespace cimdhcp {

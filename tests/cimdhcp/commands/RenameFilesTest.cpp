@@ -9,7 +9,7 @@
 #include <filesystem>
 
 #include "kit/ChildProcess.h"
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"
 #include "text/Failure.h"
 

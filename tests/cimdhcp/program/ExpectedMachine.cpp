@@ -4,7 +4,7 @@
 #include <filesystem>
 #include <regex>
 
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 
 namespace test {
 

@@ -7,7 +7,7 @@
 #include <utility>
 #include <vector>
 
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"
 
 namespace test {

@@ -1,4 +1,4 @@
-/* A library that needs a function which nobody has: it cannot be loaded. */
+/* A library that needs a function which no library has: it cannot be loaded. */
 #include <cmpift.h>
 
 CMPIInstanceMI* functionThatNobodyHas(void);

@@ -1,6 +1,5 @@
 #pragma once
 
-#include <fcntl.h>
 #include <linux/netlink.h>
 #include <linux/rtnetlink.h>
 #include <sys/socket.h>
@@ -9,7 +8,6 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
-#include <cstdlib>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
@@ -24,6 +22,7 @@
 #include "formats/InterfaceName.h"
 #include "formats/IpAddress.h"
 #include "formats/Roots.h"
+#include "kit/TemporaryDirectory.h"
 #include "zrclient/Snapshot.h"
 #include "zrcommon/File.h"
 
@@ -61,49 +60,7 @@ inline std::string sample(const std::string& name) {
     return *std::move(content);
 }
 
-/// A directory of its own that goes with its owner.
-class TemporaryDirectory {
-  public:
-    TemporaryDirectory() {
-        std::string pattern = (std::filesystem::temp_directory_path() / "zr-live-XXXXXX").string();
-        if (::mkdtemp(pattern.data()) == nullptr) {
-            throw std::runtime_error("no temporary directory");
-        }
-        path_ = pattern;
-    }
-    TemporaryDirectory(const TemporaryDirectory&) = delete;
-    TemporaryDirectory& operator=(const TemporaryDirectory&) = delete;
-    ~TemporaryDirectory() {
-        std::error_code ignored;  // a left-over directory fails no test
-        std::filesystem::remove_all(path_, ignored);
-    }
-
-    [[nodiscard]] const std::string& path() const { return path_; }
-    [[nodiscard]] std::string path(std::string_view below) const {
-        return path_ + std::string{below};
-    }
-
-    /// Makes the directories on the way, too.
-    void write(std::string_view below, std::string_view content) const {
-        const std::filesystem::path file = path(below);
-        std::filesystem::create_directories(file.parent_path());
-        std::ofstream{file, std::ios::binary} << content;
-    }
-    void append(std::string_view below, std::string_view content) const {
-        std::ofstream{path(below), std::ios::binary | std::ios::app} << content;
-    }
-    /// Lets a file have been written at a time, in seconds since the epoch.
-    void age(std::string_view below, std::int64_t seconds) const {
-        const timespec time{.tv_sec = seconds, .tv_nsec = 0};
-        const std::array<timespec, 2> times{time, time};
-        if (::utimensat(AT_FDCWD, path(below).c_str(), times.data(), 0) != 0) {
-            throw std::runtime_error("cannot age " + path(below));
-        }
-    }
-
-  private:
-    std::string path_;
-};
+using Testing::TemporaryDirectory;
 
 /// What a reader adds to the facts, of the files laid out in a directory.
 inline ClientFacts readWith(void (*reader)(const Roots& roots, ClientFacts& facts),

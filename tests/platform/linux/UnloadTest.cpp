@@ -2,8 +2,8 @@
 #include <malloc.h>
 
 #include <cstdlib>
-#include <iterator>
 
+#include "kit/OpenDescriptors.h"
 #include "kit/ZrclientSupport.h"
 
 namespace ZR::Testing {
@@ -22,11 +22,6 @@ class Variable {
   private:
     const char* name_;
 };
-
-std::ptrdiff_t openDescriptors() {
-    const std::filesystem::directory_iterator all("/proc/self/fd");
-    return std::distance(begin(all), end(all));
-}
 
 int loadAndUnload() {
     void* library = ::dlopen(ZR_UNLOAD_PROBE, RTLD_NOW | RTLD_LOCAL);

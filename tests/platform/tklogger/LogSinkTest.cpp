@@ -11,7 +11,7 @@
 #include <vector>
 
 #include "kit/ChildProcess.h"
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 #include "kit/LogCapture.h"
 #include "kit/TemporaryDirectory.h"
 

@@ -6,7 +6,7 @@
 #include <thread>
 #include <vector>
 
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 #include "kit/LogCapture.h"
 #include "kit/TemporaryDirectory.h"
 #include "tklogger/TKLogger.h"

@@ -13,7 +13,7 @@
 #include <string>
 
 #include "kit/ChildProcess.h"
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"
 #include "zrcommon/Strings.h"
 #include "zrcommon/UniqueFd.h"

@@ -11,7 +11,7 @@
 #include <vector>
 
 #include "kit/ChildProcess.h"
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 #include "kit/PrivateNamespace.h"
 #include "kit/TemporaryDirectory.h"
 #include "zrcommon/PlatformUtilities.h"

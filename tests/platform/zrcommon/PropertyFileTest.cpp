@@ -5,7 +5,7 @@
 #include <string>
 #include <vector>
 
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"
 
 namespace ZR {

@@ -5,7 +5,7 @@
 
 #include <filesystem>
 
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 #include "kit/Host.h"
 #include "kit/Tree.h"
 #include "providerutilities/ProviderUtilities.h"

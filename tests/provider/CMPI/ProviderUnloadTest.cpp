@@ -5,20 +5,15 @@
 #include <dlfcn.h>
 #include <gtest/gtest.h>
 
-#include <filesystem>
-#include <iterator>
-
 #include "kit/Host.h"
+#include "kit/OpenDescriptors.h"
 #include "kit/Tree.h"
 
 namespace {
 
-class UnloadTest : public test::TreeTest {};
+using ZR::Testing::openDescriptors;
 
-std::ptrdiff_t openDescriptors() {
-    const std::filesystem::directory_iterator entries("/proc/self/fd");
-    return std::distance(begin(entries), end(entries));
-}
+class UnloadTest : public test::TreeTest {};
 
 TEST_F(UnloadTest, AThousandLoadsLoseNoDescriptor) {
     setTree({test::host({test::dhcpInterface("eth0")})});

@@ -25,7 +25,7 @@
 
 #include "Lindows/DHCPSettingData.h"
 #include "kit/ChildProcess.h"
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 #include "kit/LogCapture.h"
 #include "kit/PrivateNamespace.h"
 #include "kit/TemporaryDirectory.h"
@@ -46,6 +46,7 @@ using ZR::Testing::LogCapture;
 using ZR::Testing::readFile;
 using ZR::Testing::TemporaryDirectory;
 using ZR::Testing::writeFile;
+using ZR::Testing::Printing::PrintTo;
 
 /// What a rewrite in place must keep of a file, apart from its content.
 struct Identity {

@@ -5,7 +5,7 @@
 
 #include <stdexcept>
 
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"
 
 namespace cimom::wbem {
