@@ -1,4 +1,4 @@
-// What the kernel, or somebody in its place, answers to the questions for links and
+// What the kernel, or a process in its place, responds to the requests for links and
 // addresses. The whole input is one message; then, in pieces whose first two bytes are
 // their length, it is the datagrams of dumps.
 #include <linux/if_addr.h>
@@ -125,18 +125,18 @@ void checkMessage(std::span<const std::byte> bytes) {
     }
 }
 
-/// Answers every receive with the next piece of the input, and says that there is
+/// Gives every receive the next piece of the input, and says that there is
 /// nothing more at its end. Never waits.
-class Answers final : public ZR::Live::NetlinkTransport {
+class Responses final : public ZR::Live::NetlinkTransport {
   public:
-    explicit Answers(fuzz::Bytes input) : input_(input) {}
+    explicit Responses(fuzz::Bytes input) : input_(input) {}
 
     int open() override { return 0; }
 
     int send(std::span<const std::byte> message) override {
-        nlmsghdr question{};
-        std::memcpy(&question, message.data(), sizeof question);
-        sequence_ = question.nlmsg_seq;
+        nlmsghdr request{};
+        std::memcpy(&request, message.data(), sizeof request);
+        sequence_ = request.nlmsg_seq;
         return 0;
     }
 
@@ -151,8 +151,8 @@ class Answers final : public ZR::Live::NetlinkTransport {
         const auto piece = std::as_bytes(input_.take(head & 0x0FFFU));
         const std::size_t size = std::min(piece.size(), buffer.size());
         std::copy_n(piece.begin(), size, buffer.begin());
-        // The number of the question, which an input cannot know, is put into the first
-        // message of its answer.
+        // The number of the request, which an input cannot know, is put into the first
+        // message of its response.
         constexpr std::size_t place = offsetof(nlmsghdr, nlmsg_seq);
         if (size >= place + sizeof sequence_) {
             std::memcpy(buffer.subspan(place).data(), &sequence_, sizeof sequence_);
@@ -169,7 +169,7 @@ class Answers final : public ZR::Live::NetlinkTransport {
 };
 
 void checkDump(const std::uint8_t* data, std::size_t size) {
-    ZR::Live::RtnetlinkReader reader(std::make_unique<Answers>(fuzz::Bytes(data, size)));
+    ZR::Live::RtnetlinkReader reader(std::make_unique<Responses>(fuzz::Bytes(data, size)));
     const auto state = reader.read(ZR::Live::Deadline::max());
     fuzz::require(state.certain == state.diagnostics.empty(), "what is not certain is told");
 }
