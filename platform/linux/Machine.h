@@ -7,7 +7,7 @@
 #include <string>
 #include <vector>
 
-#include "clients/ClientFacts.h"
+#include "facts/ClientFacts.h"
 #include "ipmi/ServiceProcessor.h"
 #include "kernel/Address.h"
 #include "kernel/Link.h"
