@@ -119,7 +119,7 @@ void coldReading(benchmark::State& state) {
         if (!requireInterfaces(*snapshot, state.range(0), state)) {
             break;
         }
-        // The kernel takes its time to close what watches files, and nobody waits for it.
+        // The kernel takes its time to close what watches files, and no caller waits for it.
         source.reset();
         state.ResumeTiming();
     }
