@@ -3,11 +3,11 @@
 // same links, addresses, directories, files and names of processes, each once, and looks
 // at none of them. getifaddrs(3) and the bare dump of links and addresses stand beside
 // it. Needs root: the links lie in a network namespace of its own, with a file system of
-// its own where DHCP clients leave their traces.
+// its own where DHCP clients leave their state files.
 //
 // The links are a bridge and macvlans above it, which count as interfaces; each has one
 // address. A namespace of as many bridges would hold the kernel's lock of all links for
-// minutes when it goes, and everybody else up with it.
+// minutes when it goes, and hold up every other process.
 //
 // Prints Google Benchmark's figures and, below them, the ratios of the same run. Those are
 // of processor time: everything here is work of the kernel for the reader or of the
@@ -119,7 +119,7 @@ void coldReading(benchmark::State& state) {
         if (!requireInterfaces(*snapshot, state.range(0), state)) {
             break;
         }
-        // The kernel takes its time to close what watches files, which no run waits for.
+        // The kernel takes its time to close what watches files, and no caller waits for it.
         source.reset();
         state.ResumeTiming();
     }

@@ -6,7 +6,7 @@
 #include <set>
 
 #include "Input.h"
-#include "clients/Lease.h"
+#include "facts/Lease.h"
 #include "support/Addresses.h"
 
 namespace {

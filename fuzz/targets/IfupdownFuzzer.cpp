@@ -7,7 +7,7 @@
 namespace {
 
 /// A blank behind each line keeps a "\" that is the last byte of a word from joining
-/// lines, and a further word keeps blanks that are none between words.
+/// lines, and a further word keeps blanks that do not separate words.
 std::string written(const ZR::Live::IfaceStanza& stanza) {
     std::string text = "iface " + stanza.name + ' ' + stanza.family + ' ' + stanza.method +
                        (stanza.method.empty() ? "" : " -") + " \n";

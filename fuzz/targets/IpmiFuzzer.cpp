@@ -1,5 +1,5 @@
-// The responses of a service processor: in pieces of a byte that tells to which request
-// it belongs and how it ends, a byte of the response's length, and the response.
+// The responses of a service processor: in pieces of a byte that tells which request is
+// responded to and how, a byte of the length of the response, and the response.
 #include <cerrno>
 
 #include "Input.h"
@@ -30,22 +30,22 @@ class Processor final : public ZR::Live::IpmiTransport {
     ZR::Live::IpmiReceived receive() override {
         ++received;
         if (input_.empty()) {
-            return {.error = EAGAIN, .answer = {}};
+            return {.error = EAGAIN, .response = {}};
         }
         const auto head = input_.number<std::uint8_t>();
         if ((head & 0xF0U) == 0xF0U) {
-            return {.error = (head & 1U) != 0 ? EAGAIN : EIO, .answer = {}};
+            return {.error = (head & 1U) != 0 ? EAGAIN : EIO, .response = {}};
         }
-        const auto answer = input_.take(input_.number<std::uint8_t>());
+        const auto response = input_.take(input_.number<std::uint8_t>());
         // The numbers of the requests go up, and the last ones are those that are open.
         const long id = lastId_ - static_cast<long>(head & 0x0FU);
         // Most requests are of the network function 0x0C; that of the channel is 0x06.
         const bool channel = (head & 0x40U) != 0;
         return {.error = 0,
                 .id = id,
-                .answer = {static_cast<std::uint8_t>(channel ? 0x07 : 0x0D),
-                           static_cast<std::uint8_t>(channel ? 0x42 : 0x02),
-                           {answer.begin(), answer.end()}}};
+                .response = {static_cast<std::uint8_t>(channel ? 0x07 : 0x0D),
+                             static_cast<std::uint8_t>(channel ? 0x42 : 0x02),
+                             {response.begin(), response.end()}}};
     }
 
     int asked = 0;
@@ -67,27 +67,27 @@ void checkRefusal(const ZR::Live::IpmiDecoded<Facts>& decoded) {
 
 void checkMessages(const std::uint8_t* data, std::size_t size) {
     fuzz::Bytes input(data, size);
-    IpmiResponse answer{input.number<std::uint8_t>(), input.number<std::uint8_t>(), {}};
+    IpmiResponse response{input.number<std::uint8_t>(), input.number<std::uint8_t>(), {}};
     const auto rest = input.take(size);
-    answer.data.assign(rest.begin(), rest.end());
-    const auto address = ZR::Live::decodeLanAddress(answer);
+    response.data.assign(rest.begin(), rest.end());
+    const auto address = ZR::Live::decodeLanAddress(response);
     checkRefusal(address);
     using Address = std::optional<ZR::Live::IpAddress>;
     if (const auto* const found = std::get_if<Address>(&address); found != nullptr && *found) {
         fuzz::require((*found)->isIPv4() && !(*found)->isUnspecified(),
                       "an address is one of IPv4, and not that which stands for none");
     }
-    const auto source = ZR::Live::decodeLanAddressSource(answer);
+    const auto source = ZR::Live::decodeLanAddressSource(response);
     checkRefusal(source);
     fuzz::require(
         !std::holds_alternative<std::uint8_t>(source) || std::get<std::uint8_t>(source) <= 15,
         "a source is a number of four bits");
-    const auto channel = ZR::Live::decodeChannelInfo(answer);
+    const auto channel = ZR::Live::decodeChannelInfo(response);
     checkRefusal(channel);
     // What later versions append changes nothing.
-    answer.data.push_back(0xAB);
+    response.data.push_back(0xAB);
     if (std::holds_alternative<ZR::Live::ChannelInfo>(channel)) {
-        fuzz::require(ZR::Live::decodeChannelInfo(answer) == channel, "more bytes do not count");
+        fuzz::require(ZR::Live::decodeChannelInfo(response) == channel, "more bytes do not count");
     }
 }
 
@@ -97,7 +97,7 @@ void checkConversation(const std::uint8_t* data, std::size_t size) {
     auto now = ZR::Live::IpmiConversation::Time{};
     ZR::Live::IpmiConversation conversation(processor, lastId,
                                             ZR::Live::IpmiConversation::usualChannel, now);
-    // Eleven at which a response is missed are more than a second; those at which the
+    // Eleven at which a response is missing are more than a second; those at which the
     // responses of one of the three rounds have come do not count.
     constexpr int looks = 11 + 3;
     for (int i = 0; i < looks && conversation.state() == State::Underway; ++i) {

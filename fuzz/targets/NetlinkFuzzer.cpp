@@ -1,4 +1,4 @@
-// What the kernel, or a process in its place, responds to requests for links and
+// What the kernel, or a process in its place, responds to the requests for links and
 // addresses. The whole input is one message; then, in pieces whose first two bytes are
 // their length, it is the datagrams of dumps.
 #include <linux/if_addr.h>
@@ -125,8 +125,8 @@ void checkMessage(std::span<const std::byte> bytes) {
     }
 }
 
-/// Gives the next piece of the input at every receive, and at its end says that there is
-/// nothing more. Never waits.
+/// Gives every receive the next piece of the input, and says that there is
+/// nothing more at its end. Never waits.
 class Responses final : public ZR::Live::NetlinkTransport {
   public:
     explicit Responses(fuzz::Bytes input) : input_(input) {}

@@ -12,7 +12,6 @@ namespace {
 using NodeLexicon::Properties;
 
 constexpr std::uint64_t hostNameMaxLength = 64;  // HOST_NAME_MAX of Linux
-constexpr const char* computerDescription = "Computer";
 
 /// What was found, in the texts of the tree.
 struct Written {
@@ -51,7 +50,7 @@ std::vector<Decision> decide(InterfaceView view) {
         if (!decisions.empty() && decisions.back().property == row.property) {
             continue;
         }
-        const auto finding = row.answer(view);
+        const auto finding = row.find(view);
         if (!finding) {
             continue;
         }
@@ -77,7 +76,7 @@ std::shared_ptr<const Snapshot> decide(MachineFacts facts, std::int64_t now, Exp
     if (explain == Explain::Yes) {
         builder.origin("kernel: the name of the system");
     }
-    const auto computer = builder.add(Snapshot::none, "ComputerSystem", computerDescription);
+    const auto computer = builder.add(Snapshot::none, "ComputerSystem", "Computer");
     builder.property(Properties::Name, machine.hostName());
     builder.property(Properties::NameMaxLength, hostNameMaxLength);
     const auto network = builder.add(computer, "Network", "Network");

@@ -25,21 +25,21 @@ namespace {
 
 constexpr int errorLevel = 6000;
 
-// What could not be read is tried again at the next request, and, when that was of no
-// use, after so long: what is in the way may end without a sign.
+// What could not be read is tried again at the next request. When it fails again for the
+// same reason, the next try comes after this time: nothing tells when the reason is gone.
 constexpr std::chrono::seconds troublePause{1};
 
-// Ten thousand links take a twentieth of it, but a machine that is busy with other things
-// gives this process its time in small pieces: half an answer would be none.
+// Ten thousand links take a twentieth of it. A busy machine needs longer, and links that
+// have come in part only are not shown.
 constexpr std::chrono::seconds kernelTime{1};
 constexpr std::chrono::milliseconds networkdTime{60};
 
-// A networkd that did not answer is left alone for so long: it would cost every reading
-// its time.
+// A networkd that did not respond is not asked again for this time: each request to it
+// would make a reading wait.
 constexpr std::chrono::seconds networkdPause{30};
 
-// Clients' own words name further places to look at, which in turn are to be
-// watched before they are read.
+// Files and command lines of clients name further files. Their directories are to be
+// watched, too, before they are read, which takes another round.
 constexpr int clientRounds = 3;
 
 std::vector<WatchedPlace> fixedPlaces(const Roots& roots) {
@@ -58,8 +58,8 @@ bool isCovered(const std::vector<WatchedPlace>& places, const WatchedPlace& want
                        [&](const WatchedPlace& place) { return place.covers(wanted); });
 }
 
-/// Adds what netlink does not tell. It makes a difference to the description only:
-/// in a namespace of its own, this may be another machine's view of the name.
+/// Adds what netlink does not tell. Only the description depends on it: in another network
+/// namespace than that of /sys, the name there may be that of another link.
 void markWireless(const Roots& roots, std::vector<Link>& links) {
     for (Link& link : links) {
         if (link.hasParentDevice && link.arphrdType == ARPHRD_ETHER && link.kind.empty()) {
@@ -70,7 +70,7 @@ void markWireless(const Roots& roots, std::vector<Link>& links) {
     }
 }
 
-/// Several readers may meet one obstacle.
+/// Several readers may report the same.
 void removeRepeated(std::vector<std::string>& diagnostics) {
     std::unordered_set<std::string> met;
     std::erase_if(diagnostics,
@@ -97,13 +97,13 @@ LiveMachine::LiveMachine(Surroundings surroundings)
 }
 
 bool LiveMachine::changed() {
-    // Being asked is what moves the talk with the service processor on.
+    // The conversation with the service processor goes on only when this is called.
     return processor_.changed() || monitor_.changed() || socketsChanged() ||
            (troubled_ && surroundings_.uptime() >= troubleRest_);
 }
 
-/// Nothing tells when a socket is closed. Where it is all that was seen of a client, it is
-/// looked at again with every question.
+/// Nothing tells when a socket is closed. Where a socket is all that was seen of a client,
+/// the sockets are therefore read with every request.
 bool LiveMachine::socketsChanged() const {
     if (!sockets_) {
         return false;
@@ -122,7 +122,7 @@ std::shared_ptr<const Snapshot> LiveMachine::read() {
     try {
         return tryToRead();
     } catch (...) {
-        // The changes that led here were taken note of, and not what they led to.
+        // The monitor has forgotten the changes, and their effect was not read.
         monitor_.markChanged();
         throw;
     }
@@ -166,7 +166,7 @@ std::shared_ptr<const Snapshot> LiveMachine::tryToRead() {
                   surroundings_.now(), surroundings_.explain);
 }
 
-/// Where networkd has links, asks it for what its files do not tell.
+/// Where networkd manages links, asks it for what its files do not tell.
 void LiveMachine::consultNetworkd(ClientFacts& clients) {
     const bool manages =
         std::any_of(clients.managements.begin(), clients.managements.end(),
@@ -175,17 +175,17 @@ void LiveMachine::consultNetworkd(ClientFacts& clients) {
     if (!manages || !surroundings_.askNetworkd || now < networkdRest_) {
         return;
     }
-    const NetworkdResponse answer =
+    const NetworkdResponse response =
         surroundings_.askNetworkd(std::chrono::steady_clock::now() + networkdTime);
-    if (!answer.reason.empty()) {
-        clients.diagnostics.push_back(answer.reason);
+    if (!response.reason.empty()) {
+        clients.diagnostics.push_back(response.reason);
         networkdRest_ = now + networkdPause;
         return;
     }
-    if (answer.json.empty()) {
+    if (response.json.empty()) {
         return;
     }
-    const auto parsed = parseNetworkdDescription(answer.json);
+    const auto parsed = parseNetworkdDescription(response.json);
     if (const auto* const reason = std::get_if<std::string_view>(&parsed)) {
         clients.diagnostics.push_back("cannot use what systemd-networkd says: " +
                                       std::string{*reason});
@@ -194,7 +194,7 @@ void LiveMachine::consultNetworkd(ClientFacts& clients) {
     addNetworkdDescription(std::get<std::vector<NetworkdAddress>>(parsed), clients);
 }
 
-/// A program that ends may leave everything else as it was.
+/// The end of a program may change nothing else that is watched.
 void LiveMachine::watchProcesses(const ClientFacts& clients) {
     std::vector<std::int32_t> pids;
     pids.reserve(clients.processes.size() + clients.managers.size());
@@ -236,7 +236,7 @@ ClientFacts LiveMachine::readClients() {
     return facts;
 }
 
-/// What went wrong for the first time may be over at once.
+/// What was not there at the last reading may be gone at the next request.
 void LiveMachine::planAnotherTry(const std::vector<std::string>& diagnostics) {
     const bool lasts =
         std::all_of(diagnostics.begin(), diagnostics.end(),
@@ -248,8 +248,8 @@ void LiveMachine::planAnotherTry(const std::vector<std::string>& diagnostics) {
     }
 }
 
-/// Reports what the last reading did not report: a lasting trouble is one
-/// line, however often the machine is read.
+/// Reports what the last reading did not report: what lasts is reported once, however
+/// often the machine is read.
 void LiveMachine::report(const std::vector<std::string>& diagnostics) {
     for (const std::string& diagnostic : diagnostics) {
         if (!reported_.contains(diagnostic)) {

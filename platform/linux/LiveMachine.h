@@ -36,7 +36,7 @@ struct Surroundings {
     /// The way to the service processor; null: the device of the machine at `roots`.
     std::unique_ptr<IpmiTransport> ipmi = nullptr;
     IpmiReader::Clock uptime = std::chrono::steady_clock::now;
-    /// Asks networkd for its description of itself; none: nobody is asked.
+    /// Asks networkd for its description of itself; empty: networkd is not asked.
     std::function<NetworkdResponse(std::chrono::steady_clock::time_point)> askNetworkd =
         Live::askNetworkd;
     Explain explain = Explain::No;

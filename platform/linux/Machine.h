@@ -7,7 +7,7 @@
 #include <string>
 #include <vector>
 
-#include "clients/ClientFacts.h"
+#include "facts/ClientFacts.h"
 #include "ipmi/ServiceProcessor.h"
 #include "kernel/Address.h"
 #include "kernel/Link.h"
@@ -47,11 +47,16 @@ struct InterfaceView {
 /// future, and the kernel has its address on that very link. The last of these
 /// removes every stale claim: files outlive all else.
 ///
-/// Clients that name links by name do not learn of a new one. A lease whose link is
-/// gone is that of the one link that has its address, if the address ends when the
-/// lease does, or has no end and the client runs. A client that names no link at all means
-/// the one that has its address. What the kernel was given at the start of the system is
-/// the only IPv4 address of the machine, if that has no end and nobody else speaks for it.
+/// A client that names links by name does not notice when a link is renamed. Three kinds
+/// of leases are therefore found by their address:
+/// - A lease that names a link which does not exist belongs to the link that has its
+///   address, if exactly one has it, and if the address ends when the lease does. An
+///   address without an end counts only while the client runs.
+/// - A lease that names no link belongs to the link that has its address, if exactly one
+///   has it.
+/// - The lease of the kernel's own start (ip=) does not tell its address: it belongs to
+///   the only IPv4 address of the machine, if that has no end and if no client, manager
+///   or configuration is known for its link.
 class Machine {
   public:
     /// `now`: seconds since the epoch.

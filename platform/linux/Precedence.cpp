@@ -15,7 +15,7 @@ namespace {
 
 using NodeLexicon::AddressSource;
 using NodeLexicon::Properties;
-using Answer = std::optional<Finding>;
+using Found = std::optional<Finding>;
 
 constexpr std::string_view socketFile = "/proc/net/udp";
 
@@ -46,7 +46,7 @@ bool isUsableIPv4(const Address& address) {
 }
 
 template <typename Condition>
-Answer firstIPv4(const InterfaceView& view, Condition condition) {
+Found firstIPv4(const InterfaceView& view, Condition condition) {
     for (const Address& address : view.addresses) {
         if (isUsableIPv4(address) && condition(address)) {
             return kernel(address.ip);
@@ -112,7 +112,7 @@ AddressSource sourceOf(const Lease& lease) {
 
 /// Each server once, that of the interface's own address first. Where two clients
 /// claim one address, only the first is heard: the one that runs.
-Answer servers(const InterfaceView& view) {
+Found servers(const InterfaceView& view) {
     std::vector<IpAddress> found;
     std::vector<IpAddress> heard;
     const Lease* first = nullptr;
@@ -134,23 +134,23 @@ Answer servers(const InterfaceView& view) {
             hear(*lease);
         }
     }
-    return first == nullptr ? Answer{} : from(*first, std::move(found));
+    return first == nullptr ? Found{} : from(*first, std::move(found));
 }
 
 constexpr std::array rows{
     DecisionRow{Properties::Name, "the kernel's name of the link",
-                [](const InterfaceView& view) -> Answer { return kernel(view.link->name); }},
+                [](const InterfaceView& view) -> Found { return kernel(view.link->name); }},
     DecisionRow{Properties::NameMaxLength, "the kernel takes no longer names",
-                [](const InterfaceView& /*view*/) -> Answer {
+                [](const InterfaceView& /*view*/) -> Found {
                     return kernel(std::uint64_t{InterfaceName::maxLength});
                 }},
     DecisionRow{Properties::InterfaceState, "administrative and operational state of the link",
-                [](const InterfaceView& view) -> Answer {
+                [](const InterfaceView& view) -> Found {
                     return kernel(std::uint64_t{isActive(*view.link) ? 1U : 0U});
                 }},
 
     DecisionRow{Properties::IPv4Address, "the address that a DHCP server leased",
-                [](const InterfaceView& view) -> Answer {
+                [](const InterfaceView& view) -> Found {
                     if (view.leases.empty()) {
                         return std::nullopt;
                     }
@@ -178,9 +178,9 @@ constexpr std::array rows{
 
     DecisionRow{
         Properties::DHCPEnabled, "the master owns the addresses of its ports",
-        [](const InterfaceView& view) { return view.enslaved ? Answer{kernel(false)} : Answer{}; }},
+        [](const InterfaceView& view) { return view.enslaved ? Found{kernel(false)} : Found{}; }},
     DecisionRow{Properties::DHCPEnabled, "the link's manager holds a lease",
-                [](const InterfaceView& view) -> Answer {
+                [](const InterfaceView& view) -> Found {
                     for (const auto* leases : {&view.leases, &view.leases6}) {
                         for (const Lease* lease : *leases) {
                             if (view.management != nullptr &&
@@ -192,113 +192,111 @@ constexpr std::array rows{
                     return std::nullopt;
                 }},
     DecisionRow{Properties::DHCPEnabled, "the configuration of the link's manager",
-                [](const InterfaceView& view) -> Answer {
+                [](const InterfaceView& view) -> Found {
                     const auto wanted =
                         view.management == nullptr ? std::nullopt : wantsDhcp(*view.management);
-                    return wanted ? Answer{from(*view.management, *wanted)} : Answer{};
+                    return wanted ? Found{from(*view.management, *wanted)} : Found{};
                 }},
     DecisionRow{Properties::DHCPEnabled, "a client runs on the link",
-                [](const InterfaceView& view) -> Answer {
-                    return view.processes.empty() ? Answer{} : from(*view.processes.front(), true);
+                [](const InterfaceView& view) -> Found {
+                    return view.processes.empty() ? Found{} : from(*view.processes.front(), true);
                 }},
     DecisionRow{Properties::DHCPEnabled, "a client that runs holds a lease of the link",
-                [](const InterfaceView& view) -> Answer {
+                [](const InterfaceView& view) -> Found {
                     // It may have been started under another name of the link.
                     return !view.leases.empty() && view.leases.front()->clientAlive
-                               ? Answer{from(*view.leases.front(), true)}
-                               : Answer{};
+                               ? Found{from(*view.leases.front(), true)}
+                               : Found{};
                 }},
-    DecisionRow{Properties::DHCPEnabled, "somebody listens on the link's DHCP client port",
+    DecisionRow{Properties::DHCPEnabled, "a socket listens on the link's DHCP client port",
                 [](const InterfaceView& view) {
                     return view.socket != nullptr || view.openSocket != nullptr
-                               ? Answer{fromSocket(true)}
-                               : Answer{};
+                               ? Found{fromSocket(true)}
+                               : Found{};
                 }},
     DecisionRow{Properties::DHCPEnabled, "the configuration that is kept for the link",
-                [](const InterfaceView& view) -> Answer {
+                [](const InterfaceView& view) -> Found {
                     const auto wanted = view.configuration == nullptr
                                             ? std::nullopt
                                             : wantsDhcp(*view.configuration);
-                    return wanted ? Answer{from(*view.configuration, *wanted)} : Answer{};
+                    return wanted ? Found{from(*view.configuration, *wanted)} : Found{};
                 }},
-    DecisionRow{Properties::DHCPEnabled,
-                "an IPv4 address with an end: somebody renews it, and only DHCP does",
+    DecisionRow{Properties::DHCPEnabled, "an IPv4 address with an end, as only DHCP clients set it",
                 [](const InterfaceView& view) {
-                    return firstIPv4(view, hasEnd) ? Answer{kernel(true)} : Answer{};
+                    return firstIPv4(view, hasEnd) ? Found{kernel(true)} : Found{};
                 }},
     DecisionRow{Properties::DHCPEnabled, "nothing speaks for DHCP",
-                [](const InterfaceView& /*view*/) -> Answer { return kernel(false); }},
+                [](const InterfaceView& /*view*/) -> Found { return kernel(false); }},
 
     DecisionRow{Properties::AddressSource, "the master owns the addresses of its ports",
                 [](const InterfaceView& view) {
-                    return view.enslaved ? Answer{kernel(source(AddressSource::Unknown))}
-                                         : Answer{};
+                    return view.enslaved ? Found{kernel(source(AddressSource::Unknown))} : Found{};
                 }},
     DecisionRow{Properties::AddressSource, "a live lease names this very address",
-                [](const InterfaceView& view) -> Answer {
+                [](const InterfaceView& view) -> Found {
                     const Lease* const lease = leaseOf(view);
-                    return lease == nullptr ? Answer{} : from(*lease, source(sourceOf(*lease)));
+                    return lease == nullptr ? Found{} : from(*lease, source(sourceOf(*lease)));
                 }},
     DecisionRow{Properties::AddressSource, "the link's manager was told this very address",
-                [](const InterfaceView& view) -> Answer {
+                [](const InterfaceView& view) -> Found {
                     return view.management != nullptr && view.address != nullptr &&
                                    names(*view.management, *view.address)
-                               ? Answer{from(*view.management, source(AddressSource::Static))}
-                               : Answer{};
+                               ? Found{from(*view.management, source(AddressSource::Static))}
+                               : Found{};
                 }},
     DecisionRow{Properties::AddressSource, "169.254/16 with link scope (RFC 3927)",
                 [](const InterfaceView& view) {
                     return view.address != nullptr && isLinkLocal(*view.address)
-                               ? Answer{kernel(source(AddressSource::LinkLocal))}
-                               : Answer{};
+                               ? Found{kernel(source(AddressSource::LinkLocal))}
+                               : Found{};
                 }},
     DecisionRow{Properties::AddressSource, "the link's manager uses the address for others",
-                [](const InterfaceView& view) -> Answer {
+                [](const InterfaceView& view) -> Found {
                     return view.management != nullptr && view.address != nullptr &&
                                    view.management->other4
-                               ? Answer{from(*view.management, source(AddressSource::Other))}
-                               : Answer{};
+                               ? Found{from(*view.management, source(AddressSource::Other))}
+                               : Found{};
                 }},
     DecisionRow{Properties::AddressSource, "a DHCP client listens at this very address",
                 [](const InterfaceView& view) {
                     return view.address != nullptr && view.socket != nullptr &&
                                    view.socket->address == view.address->ip
-                               ? Answer{fromSocket(source(AddressSource::DHCP))}
-                               : Answer{};
+                               ? Found{fromSocket(source(AddressSource::DHCP))}
+                               : Found{};
                 }},
     DecisionRow{Properties::AddressSource,
-                "an IPv4 address with an end: somebody renews it, and only DHCP does",
+                "an IPv4 address with an end, as only DHCP clients set it",
                 [](const InterfaceView& view) {
                     return view.address != nullptr && hasEnd(*view.address)
-                               ? Answer{kernel(source(AddressSource::DHCP))}
-                               : Answer{};
+                               ? Found{kernel(source(AddressSource::DHCP))}
+                               : Found{};
                 }},
-    DecisionRow{
-        Properties::AddressSource, "set once at the start of the system, and left as it is since",
-        [](const InterfaceView& view) -> Answer {
-            return view.address != nullptr && view.formerLease != nullptr &&
-                           view.formerLease->address == view.address->ip
-                       ? Answer{from(*view.formerLease, source(sourceOf(*view.formerLease)))}
-                       : Answer{};
-        }},
+    DecisionRow{Properties::AddressSource,
+                "set once at the start of the system, and left as it is since",
+                [](const InterfaceView& view) -> Found {
+                    return view.address != nullptr && view.formerLease != nullptr &&
+                                   view.formerLease->address == view.address->ip
+                               ? Found{from(*view.formerLease, source(sourceOf(*view.formerLease)))}
+                               : Found{};
+                }},
     DecisionRow{Properties::AddressSource, "udhcpc runs, which sets addresses without an end",
-                [](const InterfaceView& view) -> Answer {
+                [](const InterfaceView& view) -> Found {
                     const ClientProcess* const process = process4(view);
                     return view.address != nullptr && isPermanent(*view.address) &&
                                    process != nullptr && process->client == Client::Udhcpc
-                               ? Answer{from(*process, source(AddressSource::DHCP))}
-                               : Answer{};
+                               ? Found{from(*process, source(AddressSource::DHCP))}
+                               : Found{};
                 }},
     DecisionRow{Properties::AddressSource, "the configuration names this very address",
-                [](const InterfaceView& view) -> Answer {
+                [](const InterfaceView& view) -> Found {
                     return view.configuration != nullptr && view.address != nullptr &&
                                    names(*view.configuration, *view.address)
-                               ? Answer{from(*view.configuration, source(AddressSource::Static))}
-                               : Answer{};
+                               ? Found{from(*view.configuration, source(AddressSource::Static))}
+                               : Found{};
                 }},
     DecisionRow{Properties::AddressSource,
                 "the configuration that is kept for the link, which no manager has",
-                [](const InterfaceView& view) -> Answer {
+                [](const InterfaceView& view) -> Found {
                     if (view.configuration == nullptr || view.management != nullptr ||
                         view.address == nullptr) {
                         return std::nullopt;
@@ -311,8 +309,8 @@ constexpr std::array rows{
                         return from(configuration, source(AddressSource::BOOTP));
                     }
                     return configuration.other4
-                               ? Answer{from(configuration, source(AddressSource::Other))}
-                               : Answer{};
+                               ? Found{from(configuration, source(AddressSource::Other))}
+                               : Found{};
                 }},
     DecisionRow{Properties::AddressSource, "permanent, and no DHCPv4 client that could have set it",
                 [](const InterfaceView& view) {
@@ -320,22 +318,22 @@ constexpr std::array rows{
                         view.management != nullptr && view.management->dhcp4.value_or(false);
                     return view.address != nullptr && isPermanent(*view.address) &&
                                    process4(view) == nullptr && !managerWantsDhcp
-                               ? Answer{kernel(source(AddressSource::Static))}
-                               : Answer{};
+                               ? Found{kernel(source(AddressSource::Static))}
+                               : Found{};
                 }},
-    DecisionRow{Properties::AddressSource, "an address that nobody speaks for",
+    DecisionRow{Properties::AddressSource, "an address that no program and no file tells of",
                 [](const InterfaceView& view) {
-                    return view.address != nullptr ? Answer{kernel(source(AddressSource::Unknown))}
-                                                   : Answer{};
+                    return view.address != nullptr ? Found{kernel(source(AddressSource::Unknown))}
+                                                   : Found{};
                 }},
     DecisionRow{Properties::AddressSource, "no address yet: a DHCP client is to give one",
-                [](const InterfaceView& view) -> Answer {
+                [](const InterfaceView& view) -> Found {
                     const ClientProcess* const process = process4(view);
-                    return process != nullptr ? Answer{from(*process, source(AddressSource::DHCP))}
-                                              : Answer{};
+                    return process != nullptr ? Found{from(*process, source(AddressSource::DHCP))}
+                                              : Found{};
                 }},
     DecisionRow{Properties::AddressSource, "no address yet: what is meant to give one",
-                [](const InterfaceView& view) -> Answer {
+                [](const InterfaceView& view) -> Found {
                     const LinkConfiguration* const meant = intent(view);
                     if (meant == nullptr) {
                         return std::nullopt;
@@ -352,28 +350,28 @@ constexpr std::array rows{
                     if (meant->linkLocal4) {
                         return from(*meant, source(AddressSource::LinkLocal));
                     }
-                    return meant->other4 ? Answer{from(*meant, source(AddressSource::Other))}
-                                         : Answer{};
+                    return meant->other4 ? Found{from(*meant, source(AddressSource::Other))}
+                                         : Found{};
                 }},
-    DecisionRow{Properties::AddressSource, "no address, and nobody means to give one",
-                [](const InterfaceView& /*view*/) -> Answer {
+    DecisionRow{Properties::AddressSource, "no address, and nothing that is meant to give one",
+                [](const InterfaceView& /*view*/) -> Found {
                     return kernel(source(AddressSource::Unknown));
                 }},
 
     DecisionRow{Properties::DHCPServerAddresses, "the master owns the addresses of its ports",
                 [](const InterfaceView& view) {
-                    return view.enslaved ? Answer{kernel(std::vector<IpAddress>{})} : Answer{};
+                    return view.enslaved ? Found{kernel(std::vector<IpAddress>{})} : Found{};
                 }},
     DecisionRow{Properties::DHCPServerAddresses, "the servers of the live leases", servers},
     DecisionRow{Properties::DHCPServerAddresses, "the one that the link's DHCP client talks to",
                 [](const InterfaceView& view) {
                     return view.socket != nullptr && view.socket->peer
-                               ? Answer{fromSocket(std::vector{*view.socket->peer})}
-                               : Answer{};
+                               ? Found{fromSocket(std::vector{*view.socket->peer})}
+                               : Found{};
                 }},
     DecisionRow{
-        Properties::DHCPServerAddresses, "nobody tells of a server",
-        [](const InterfaceView& /*view*/) -> Answer { return kernel(std::vector<IpAddress>{}); }},
+        Properties::DHCPServerAddresses, "no client tells of a server",
+        [](const InterfaceView& /*view*/) -> Found { return kernel(std::vector<IpAddress>{}); }},
 };
 
 }  // namespace

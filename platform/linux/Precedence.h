@@ -39,11 +39,11 @@ struct DecisionRow {
     NodeLexicon::Properties property;
     std::string_view reason;
     /// nullopt: this row cannot tell, the next one of the property is asked.
-    std::optional<Finding> (*answer)(const InterfaceView& view);
+    std::optional<Finding> (*find)(const InterfaceView& view);
 };
 
-/// The precedence table: of each property the first row that answers counts. A
-/// property that no row answers is left out.
+/// The precedence table: of each property the first row that finds a value counts. A
+/// property for which no row finds one is left out.
 [[nodiscard]] std::span<const DecisionRow> precedence();
 
 }  // namespace ZR::Live

@@ -3,7 +3,7 @@
 #include <span>
 #include <string_view>
 
-#include "clients/ClientFacts.h"
+#include "facts/ClientFacts.h"
 #include "formats/Roots.h"
 
 namespace ZR::Live {

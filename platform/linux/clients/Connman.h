@@ -3,7 +3,7 @@
 #include <optional>
 #include <string_view>
 
-#include "clients/ClientFacts.h"
+#include "facts/ClientFacts.h"
 #include "formats/IpAddress.h"
 #include "formats/Roots.h"
 

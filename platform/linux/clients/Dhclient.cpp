@@ -119,8 +119,8 @@ void addProcessFile(const Roots& roots, const ClientProcess& process, LeaseFiles
         }
         return;
     }
-    // A name that is not absolute depends on a directory that the client has left
-    // since; nobody can tell which file it is.
+    // A relative name depends on the directory in which the client was started, which is
+    // not known.
     if (process.leaseFile.front() != '/') {
         return;
     }
@@ -142,8 +142,7 @@ void addLeases(const LeaseFile& file, ClientFacts& facts) {
     if (!content) {
         return;
     }
-    // A torn end is the ordinary sight of a client that is writing just now; the
-    // rest of it will be noticed like any other change.
+    // A file that ends within a block is being written: the rest shows as a change.
     for (const DhclientLease& lease : parseDhclientLeases(*content)) {
         const bool alive = keeps(file, lease);
         for (const DhclientAddress& address : lease.addresses) {

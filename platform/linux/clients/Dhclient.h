@@ -6,7 +6,7 @@
 #include <string>
 #include <string_view>
 
-#include "clients/ClientFacts.h"
+#include "facts/ClientFacts.h"
 #include "formats/Roots.h"
 
 namespace ZR::Live {

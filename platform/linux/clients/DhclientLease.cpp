@@ -9,7 +9,7 @@
 #include <cstddef>
 #include <utility>
 
-#include "clients/Lease.h"
+#include "facts/Lease.h"
 #include "formats/Numbers.h"
 
 namespace ZR::Live {

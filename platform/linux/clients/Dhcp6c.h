@@ -4,7 +4,7 @@
 #include <span>
 #include <string_view>
 
-#include "clients/RunningPrograms.h"
+#include "facts/RunningPrograms.h"
 
 namespace ZR::Live {
 

@@ -22,7 +22,8 @@ constexpr std::array<std::string_view, 24> longWithValue{
     "inform",    "static", "timeout",         "userclass",      "vendor",        "whitelist",
     "blacklist", "reboot", "allowinterfaces", "denyinterfaces", "nohook",        "clientid"};
 
-// Commands to another dhcpcd, and questions: no clients.
+// Commands to a running dhcpcd, and requests for information: such a process is not a
+// client.
 constexpr std::string_view commandLetters = "gknNPUVx";
 constexpr std::array<std::string_view, 8> longCommands{
     "reconfigure", "release", "rebind", "renew", "printpidfile", "dumplease", "variables", "exit"};
@@ -70,8 +71,8 @@ class Reader {
     explicit Reader(ClientFacts& facts) : facts_(facts) {}
 
     void readFile(const LeaseFile& file, bool ipv6) {
-        // The file is rewritten in its place, so that half of it can be caught; the
-        // other half is there in no time.
+        // The file is rewritten in place: a reading may find half of it. The other half
+        // follows at once.
         std::optional<std::string_view> reason;
         for (int attempt = 0; attempt < 2; ++attempt) {
             const auto content = readOptionalFile(file.path, facts_.diagnostics);
@@ -93,8 +94,8 @@ class Reader {
             return *reason;
         }
         const auto& reply = std::get<DhcpReply>(parsed);
-        // A BOOTP reply has no lease time: the address is for ever (RFC 951). A DHCP one
-        // without is the answer to a question for settings alone.
+        // A BOOTP reply has no lease time: the address is for ever (RFC 951). A DHCP reply
+        // without one is that to a DHCPINFORM, which gives settings and no address.
         if (reply.address && (reply.leaseTime || reply.bootp)) {
             Lease lease{.client = Client::Dhcpcd,
                         .interfaceName = {},

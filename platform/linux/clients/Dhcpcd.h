@@ -6,7 +6,7 @@
 #include <string_view>
 #include <vector>
 
-#include "clients/ClientFacts.h"
+#include "facts/ClientFacts.h"
 #include "formats/InterfaceName.h"
 #include "formats/Roots.h"
 

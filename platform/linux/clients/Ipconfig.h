@@ -4,7 +4,7 @@
 #include <optional>
 #include <string_view>
 
-#include "clients/ClientFacts.h"
+#include "facts/ClientFacts.h"
 #include "formats/InterfaceName.h"
 #include "formats/IpAddress.h"
 #include "formats/Roots.h"

@@ -18,7 +18,7 @@ constexpr std::string_view internalLeasePrefix = "internal-";
 constexpr std::string_view leaseSuffix = ".lease";
 constexpr std::size_t uuidLength = 36;
 
-/// "address", "address1", "addresses" and so on; "address-data" is none of ours.
+/// "address", "address1", "addresses" and so on; "address-data" is another key.
 bool isAddressKey(std::string_view key) {
     if (!key.starts_with("address")) {
         return false;
@@ -60,7 +60,7 @@ std::vector<ProfileFile> readProfiles(const Roots& roots, ClientFacts& facts) {
     return profiles;
 }
 
-/// What a profile says. Methods that nobody here knows say nothing.
+/// What a profile says. An unknown method says nothing.
 LinkConfiguration configurationOf(const ProfileFile& file) {
     const NetworkManagerProfile& profile = file.profile;
     LinkConfiguration configuration{.client = Client::NetworkManager,
@@ -146,8 +146,8 @@ void readDevices(const Roots& roots, const std::vector<ProfileFile>& profiles, C
     }
 }
 
-/// The files of the built-in client. Newer versions keep nothing but the address, in
-/// order to ask for it again: it may be anybody's by now, and proves nothing.
+/// The files of the built-in client. Newer versions keep the address alone, in order to
+/// request it again: such a file proves nothing, as the address may be another's by now.
 void readInternalLeases(const Roots& roots, ClientFacts& facts) {
     const std::string directory = roots.path(networkManagerState);
     for (const std::string& name : listOptionalDirectory(directory, facts.diagnostics)) {

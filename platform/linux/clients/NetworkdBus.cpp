@@ -38,7 +38,7 @@ std::optional<IpAddress> addressOf(const Json& value, int family) {
     return IpAddress::fromBytes(family, bytes);
 }
 
-/// The member of an object; null where it has none, or is no object.
+/// The member of an object; null where it has none, or is not an object.
 const Json& member(const Json& object, const char* name) {
     static const Json none;
     if (!object.is_object()) {
@@ -108,8 +108,8 @@ std::uint64_t left(Deadline deadline) {
     return static_cast<std::uint64_t>(std::max<std::int64_t>(time.count(), 0));
 }
 
-/// Waits until the bus has let us in. The library's own calls would wait for that as
-/// long as it takes. Answers an errno, 0 for none.
+/// Waits until the bus has accepted the connection. The library's own calls would wait for
+/// that without a limit. Returns an errno, 0 for none.
 int awaitReady(sd_bus* bus, Deadline deadline) {
     for (;;) {
         const int ready = SdBus::get()->isReady(bus);
@@ -145,7 +145,7 @@ NetworkdResponse failure(int error) {
 Parsed<std::vector<NetworkdAddress>> parseNetworkdDescription(std::string_view json) {
     const Json document = Json::parse(json, nullptr, false);
     if (!document.is_object()) {
-        return std::string_view{"no JSON object"};
+        return std::string_view{"not a JSON object"};
     }
     std::vector<NetworkdAddress> addresses;
     const Json& links = member(document, "Interfaces");
@@ -178,20 +178,20 @@ NetworkdResponse askNetworkd(Deadline deadline) {
     const int make =
         functions->newMethodCall(bus.get(), &made, service, "/org/freedesktop/network1",
                                  "org.freedesktop.network1.Manager", "Describe");
-    const BusMessage question{made};
+    const BusMessage request{made};
     if (make < 0) {
         return failure(-make);
     }
-    if (const int set = functions->setAutoStart(question.get(), 0); set < 0) {
+    if (const int set = functions->setAutoStart(request.get(), 0); set < 0) {
         return failure(-set);
     }
     BusError error;
-    sd_bus_message* answered = nullptr;
+    sd_bus_message* responded = nullptr;
     // A timeout of 0 would mean the library's own of 25 seconds.
     const int call =
-        functions->call(bus.get(), question.get(), std::max<std::uint64_t>(left(deadline), 1),
-                        error.get(), &answered);
-    const BusMessage answer{answered};
+        functions->call(bus.get(), request.get(), std::max<std::uint64_t>(left(deadline), 1),
+                        error.get(), &responded);
+    const BusMessage response{responded};
     if (call < 0) {
         const bool absent = error.is(SD_BUS_ERROR_SERVICE_UNKNOWN) ||
                             error.is(SD_BUS_ERROR_NAME_HAS_NO_OWNER) ||
@@ -199,7 +199,8 @@ NetworkdResponse askNetworkd(Deadline deadline) {
         return absent ? NetworkdResponse{} : failure(-call);
     }
     const char* text = nullptr;
-    if (const int read = functions->readBasic(answer.get(), SD_BUS_TYPE_STRING, &text); read < 0) {
+    if (const int read = functions->readBasic(response.get(), SD_BUS_TYPE_STRING, &text);
+        read < 0) {
         return failure(-read);
     }
     return {.json = text, .reason = {}};

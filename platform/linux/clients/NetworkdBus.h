@@ -7,7 +7,7 @@
 #include <string_view>
 #include <vector>
 
-#include "clients/ClientFacts.h"
+#include "facts/ClientFacts.h"
 #include "formats/IpAddress.h"
 #include "formats/Parsed.h"
 
@@ -24,11 +24,11 @@ struct NetworkdAddress {
 };
 
 /// Parses networkd's description of itself, or of one link. Any text gives facts or a
-/// reason; addresses that are none are skipped.
+/// reason; what is not an address is skipped.
 [[nodiscard]] Parsed<std::vector<NetworkdAddress>> parseNetworkdDescription(std::string_view json);
 
 /// A description as text, or the reason why there is none; both empty where there is
-/// no bus or no networkd to be asked.
+/// no bus or no networkd.
 struct NetworkdResponse {
     std::string json;
     std::string reason;
@@ -36,7 +36,7 @@ struct NetworkdResponse {
     bool operator==(const NetworkdResponse&) const = default;
 };
 
-/// Asks the networkd of this machine over the system bus. Starts nothing, and answers
+/// Asks the networkd of this machine over the system bus. Starts nothing, and returns
 /// at the deadline at the latest, whatever the bus and networkd do. Never throws apart
 /// from std::bad_alloc.
 [[nodiscard]] NetworkdResponse askNetworkd(std::chrono::steady_clock::time_point deadline);

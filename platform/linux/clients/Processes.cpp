@@ -74,7 +74,7 @@ class ProcessPath {
 };
 
 /// Reads from the beginning of a file of /proc; empty when the process is gone or
-/// hidden, which is no failure.
+/// hidden, which is not an error.
 std::string_view readShort(int proc, const char* path, std::span<char> buffer) {
     const UniqueFd fd{::openat(proc, path, O_RDONLY | O_CLOEXEC)};
     if (!fd) {

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "clients/ClientFacts.h"
+#include "facts/ClientFacts.h"
 #include "formats/Roots.h"
 
 namespace ZR::Live {

@@ -11,7 +11,7 @@ std::shared_ptr<const SdBus> SdBus::get() {
     static std::mutex mutex;
     static std::shared_ptr<const SdBus> functions;
     const std::lock_guard lock(mutex);
-    // What was in the way, a want of descriptors say, may be over.
+    // The reason of a failure, such as a lack of descriptors, may be gone.
     if (!functions || !functions->missing().empty()) {
         functions = std::make_shared<const SdBus>("libsystemd.so.0");
     }

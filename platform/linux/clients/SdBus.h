@@ -7,10 +7,10 @@
 
 namespace ZR::Live {
 
-/// The functions of libsystemd that a question over the system bus needs. The library is
-/// loaded with the first question, not with this code: with what it stands on
-/// (compression, ciphers) it would double what a process pays for the provider, where
-/// most machines have nobody on the bus who is asked.
+/// The functions of libsystemd that a request over the system bus needs. The library is
+/// loaded with the first request, not with this code: with the libraries that it needs
+/// (compression, ciphers) it would double what the provider costs a process, and most
+/// machines have no networkd to be asked.
 class SdBus {
   public:
     /// Those of this process, kept until this code itself is unloaded. While they cannot

@@ -7,7 +7,7 @@
 #include <string_view>
 #include <vector>
 
-#include "clients/ClientFacts.h"
+#include "facts/ClientFacts.h"
 #include "formats/IpAddress.h"
 #include "formats/Parsed.h"
 #include "formats/Roots.h"

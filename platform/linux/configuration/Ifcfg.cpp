@@ -33,7 +33,7 @@ bool isAddressName(std::string_view name) {
            name.find_first_not_of("0123456789") == std::string_view::npos;
 }
 
-/// What a file says. nullopt in dhcp4 for a protocol that nobody here knows.
+/// What a file says. nullopt in dhcp4 for an unknown protocol.
 LinkConfiguration configurationOf(IfcfgFile&& file) {
     LinkConfiguration configuration{.client = Client::Ifcfg,
                                     .dhcp4 = {},

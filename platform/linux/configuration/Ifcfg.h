@@ -5,7 +5,7 @@
 #include <string_view>
 #include <vector>
 
-#include "clients/ClientFacts.h"
+#include "facts/ClientFacts.h"
 #include "formats/IpAddress.h"
 #include "formats/Roots.h"
 

@@ -52,7 +52,7 @@ void takeOption(std::string_view keyword, std::string_view rest, IfaceStanza& st
     }
 }
 
-/// Stanzas that are none of an interface's end the one before them.
+/// Whether a stanza begins that is not one of an interface; it ends the one before it.
 bool beginsStanza(std::string_view keyword) {
     constexpr std::array<std::string_view, 6> keywords{"auto",       "mapping", "no-auto-down",
                                                        "no-scripts", "rename",  "template"};
@@ -131,7 +131,7 @@ void apply(const IfaceStanza& stanza, LinkConfiguration& configuration) {
     }
     const bool other = method == "ppp" || method == "wvdial" || method == "tunnel";
     if (method != "static" && method != "bootp" && method != "ipv4ll" && !other) {
-        return;  // "manual", "loopback", and what nobody here knows
+        return;  // "manual", "loopback", and unknown methods
     }
     configuration.dhcp4 = configuration.dhcp4.value_or(false);
     configuration.bootp4 = configuration.bootp4 || method == "bootp";

@@ -5,7 +5,7 @@
 #include <utility>
 #include <vector>
 
-#include "clients/ClientFacts.h"
+#include "facts/ClientFacts.h"
 #include "formats/InterfaceName.h"
 #include "formats/IpAddress.h"
 #include "formats/Roots.h"

@@ -2,7 +2,7 @@
 
 #include <string_view>
 
-#include "clients/ClientFacts.h"
+#include "facts/ClientFacts.h"
 #include "formats/Roots.h"
 
 namespace ZR::Live {

@@ -83,7 +83,7 @@ struct Options {
     }
 };
 
-/// Gathers options up to the end option. Answers a reason when one cannot be true;
+/// Gathers options up to the end option. Returns a reason when one cannot be true;
 /// `ended` tells whether there was an end option.
 std::string_view gather(Bytes area, Options& options, bool& ended) {
     ended = false;

@@ -35,7 +35,7 @@ struct Dhcp6Address {
 };
 
 /// What a server's DHCPv6 reply says (RFC 8415). It names its server by a DUID only,
-/// which is no address.
+/// which is not an address.
 struct Dhcp6Reply {
     std::vector<Dhcp6Address> addresses;
 

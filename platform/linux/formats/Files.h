@@ -7,8 +7,8 @@
 
 namespace ZR::Live {
 
-/// The content of a file that need not exist. That it cannot be read although it
-/// exists is another thing, and goes to the diagnostics.
+/// The content of a file that need not exist; nullopt without it. When it exists and
+/// cannot be read, a diagnostic is added.
 [[nodiscard]] std::optional<std::string> readOptionalFile(const std::string& path,
                                                           std::vector<std::string>& diagnostics);
 

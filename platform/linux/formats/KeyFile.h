@@ -10,7 +10,7 @@ namespace ZR::Live {
 
 /// Runs over the lines KEY=value of a text with [sections], as systemd and
 /// NetworkManager write them: action(section, key, value), blanks around each taken
-/// off. Comments and lines that are no pair are skipped; any text is walked.
+/// off. Comments and lines that are not a pair are skipped; any text is walked.
 template <typename Action>
 void forEachKey(std::string_view text, Action action) {
     std::string_view section;

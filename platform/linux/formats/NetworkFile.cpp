@@ -40,7 +40,7 @@ void applyDhcp(std::string_view value, NetworkFile& settings) {
         settings.dhcp4 = false;
         settings.dhcp6 = true;
     }
-    // networkd keeps what it had when it does not know a value, and so do we.
+    // Like networkd, keeps what it had when it does not know a value.
 }
 
 void applyAddress(std::string_view section, std::string_view value, NetworkFile& settings) {

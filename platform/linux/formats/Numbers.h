@@ -7,8 +7,8 @@
 
 namespace ZR::Live {
 
-/// The number that the whole text is; nullopt when it is none, has anything around
-/// it, or does not fit.
+/// The number that the whole text is; nullopt when it is not a number, has anything
+/// around it, or does not fit.
 template <typename Number>
 [[nodiscard]] std::optional<Number> parseNumber(std::string_view text, int base = 10) noexcept {
     Number value{};

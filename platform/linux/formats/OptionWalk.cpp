@@ -38,7 +38,7 @@ bool OptionWalk::next(CommandOption& option) noexcept {
                        longWithValue_.end()) {
                 option.value = nextArgument();
             }
-            // "--=value" has neither a name nor a letter, and is no operand either.
+            // "--=value" has neither a name nor a letter, and is not an operand either.
             option.letter = option.longName.empty() ? '-' : '\0';
             return true;
         }

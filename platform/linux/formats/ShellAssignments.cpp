@@ -12,7 +12,7 @@ constexpr std::string_view nameLetters =
     "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789_";
 
 /// The first word of an assignment's right side, its quotes taken off. What stands
-/// behind it is a comment or another command, and none of ours.
+/// behind it is a comment or another command, and does not count.
 std::string firstWord(std::string_view text) {
     std::string word;
     char quote = '\0';

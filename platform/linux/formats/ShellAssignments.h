@@ -15,7 +15,7 @@ struct ShellAssignment {
 };
 
 /// The assignments NAME=value, NAME='value', NAME="value", also behind "export", in
-/// their order. Any text gives facts: what is no assignment is skipped, and nothing
+/// their order. Any text gives facts: what is not an assignment is skipped, and nothing
 /// is ever executed.
 [[nodiscard]] std::vector<ShellAssignment> parseShellAssignments(std::string_view text);
 

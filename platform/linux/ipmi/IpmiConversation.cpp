@@ -10,14 +10,14 @@
 namespace ZR::Live {
 namespace {
 
-// Stands for the channel of the question itself, whatever its number is. The numbers
+// Stands for the channel over which the request comes, whatever its number. The numbers
 // below 0xC are those that a medium can be assigned to (IPMI 2.0, table 6-1).
 constexpr std::uint8_t presentChannel = 0xE;
 constexpr std::array<std::uint8_t, 12> channels{1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, presentChannel};
 
-// More than all questions together: what comes beyond is heard next time, so that
-// nobody's flood keeps a caller here.
-constexpr int longestHearing = 64;
+// More messages than there are requests. What comes beyond is taken at the next call, so
+// that a flood of messages cannot keep a caller here.
+constexpr int mostMessages = 64;
 
 }  // namespace
 
@@ -28,7 +28,7 @@ IpmiConversation::IpmiConversation(IpmiTransport& transport, long& lastId, std::
 }
 
 IpmiConversation::State IpmiConversation::continue_(Time now) {
-    for (int i = 0; i < longestHearing && state_ == State::Underway; ++i) {
+    for (int i = 0; i < mostMessages && state_ == State::Underway; ++i) {
         const IpmiReceived received = transport_.receive();
         if (received.error == EAGAIN) {
             break;
@@ -37,10 +37,10 @@ IpmiConversation::State IpmiConversation::continue_(Time now) {
             fail("cannot receive: " + reasonOf(received.error));
             break;
         }
-        // Numbers that are not open are those of nobody here, or of questions that
-        // have been answered already.
-        if (const auto question = open_.extract(received.id)) {
-            hear(question.mapped(), received.answer);
+        // A message with another number is not for this conversation, or is a second
+        // response to one request.
+        if (const auto request = open_.extract(received.id)) {
+            take(request.mapped(), received.response);
             if (open_.empty()) {
                 endRound(now);
             }
@@ -93,28 +93,28 @@ void IpmiConversation::ask(Topic topic, std::uint8_t channel) {
         fail("cannot ask: " + reasonOf(error));
         return;
     }
-    open_.emplace(id, Question{topic, channel});
+    open_.emplace(id, OpenRequest{topic, channel});
 }
 
-void IpmiConversation::hear(const Question& question, const IpmiResponse& answer) {
-    switch (question.topic) {
+void IpmiConversation::take(const OpenRequest& request, const IpmiResponse& response) {
+    switch (request.topic) {
         case Topic::Address:
-            address_ = decodeLanAddress(answer);
+            address_ = decodeLanAddress(response);
             break;
         case Topic::AddressSource:
-            addressSource_ = decodeLanAddressSource(answer);
+            addressSource_ = decodeLanAddressSource(response);
             break;
         case Topic::Channel: {
-            const auto decoded = decodeChannelInfo(answer);
+            const auto decoded = decodeChannelInfo(response);
             // A channel that does not exist is refused, by a code of the maker's choice.
             if (const auto* const refusal = std::get_if<IpmiRefusal>(&decoded)) {
                 if (refusal->passing()) {
                     passing_ = *refusal;
                 }
             } else if (const auto& info = std::get<ChannelInfo>(decoded); info.isLan()) {
-                // Of another channel than the one asked about nothing can be told.
-                if (info.channel == question.channel || question.channel == presentChannel) {
-                    lanChannels_.emplace(question.channel, info.channel);
+                // A response about another channel than the request's tells nothing.
+                if (info.channel == request.channel || request.channel == presentChannel) {
+                    lanChannels_.emplace(request.channel, info.channel);
                 }
             }
             break;
@@ -142,7 +142,7 @@ void IpmiConversation::endRound(Time now) {
     }
 }
 
-/// What one parameter lacks is no reason to hide the other, nor the channel itself.
+/// Where one parameter is not usable, the other and the channel itself still count.
 void IpmiConversation::conclude(std::uint8_t channel) {
     LanChannel lan{.channel = channel, .addressSource = std::nullopt, .address = {}};
     const auto take = [this](auto& decoded, auto& value, const char* subject) {
@@ -168,7 +168,7 @@ void IpmiConversation::conclude(std::uint8_t channel) {
 void IpmiConversation::checkPatience(Time now) {
     missed_ = now;
     if (waited_ + (missed_ - begun_) > patience) {
-        fail("no answer within one second");
+        fail("no response within one second");
     }
 }
 

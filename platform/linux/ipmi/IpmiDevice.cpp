@@ -83,16 +83,16 @@ class Device final : public IpmiTransport {
         const int error = control(fd_.get(), IPMICTL_RECEIVE_MSG_TRUNC, message);
         // EMSGSIZE: the beginning of a longer message was delivered, which will do.
         if (error != 0 && error != EMSGSIZE) {
-            return {.error = error, .answer = {}};
+            return {.error = error, .response = {}};
         }
         if (message.recv_type != IPMI_RESPONSE_RECV_TYPE) {
-            return {.answer = {}};
+            return {.response = {}};
         }
         if (message.msg.data_len < data.size()) {
             data.resize(message.msg.data_len);
         }
         return {.id = message.msgid,
-                .answer = {message.msg.netfn, message.msg.cmd, std::move(data)}};
+                .response = {message.msg.netfn, message.msg.cmd, std::move(data)}};
     }
 
   private:

@@ -15,7 +15,7 @@ inline constexpr std::array<std::string_view, 3> ipmiDevices{"/dev/ipmi0", "/dev
                                                              "/dev/ipmidev/0"};
 
 /// The way through the kernel's IPMI device interface (linux/ipmi.h), which needs
-/// root. The driver makes the device only once a processor has answered it.
+/// root. The driver makes the device only once a processor has responded to it.
 [[nodiscard]] std::unique_ptr<IpmiTransport> ipmiDevice(const Roots& roots);
 
 }  // namespace ZR::Live

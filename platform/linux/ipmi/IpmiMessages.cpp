@@ -17,7 +17,7 @@ constexpr std::uint8_t addressParameter = 3;
 constexpr std::uint8_t addressSourceParameter = 4;
 
 // Node busy, time-out, update mode, initialization, destination unavailable, and
-// "unspecified", which the kernel answers in the name of a processor that it lost.
+// "unspecified", which the kernel sends in place of a processor that it lost.
 constexpr std::array<std::uint8_t, 6> passingCodes{0xC0, 0xC3, 0xD1, 0xD2, 0xD3, 0xFF};
 
 IpmiRequest getLanParameter(std::uint8_t channel, std::uint8_t parameter) {
@@ -31,29 +31,31 @@ std::string hexadecimal(std::uint8_t number) {
 }
 
 /// The bytes behind the completion code.
-IpmiDecoded<std::span<const std::uint8_t>> payload(const IpmiResponse& answer, std::uint8_t request,
-                                                   std::uint8_t command, std::size_t size) {
-    if (answer.netFn != request + 1 || answer.command != command) {
-        return IpmiRefusal{std::nullopt, "the answer is one to another command"};
+IpmiDecoded<std::span<const std::uint8_t>> payload(const IpmiResponse& response,
+                                                   std::uint8_t request, std::uint8_t command,
+                                                   std::size_t size) {
+    if (response.netFn != request + 1 || response.command != command) {
+        return IpmiRefusal{std::nullopt, "the response is to another command"};
     }
-    if (answer.data.empty()) {
-        return IpmiRefusal{std::nullopt, "the answer is empty"};
+    if (response.data.empty()) {
+        return IpmiRefusal{std::nullopt, "the response is empty"};
     }
-    const std::uint8_t code = answer.data.front();
+    const std::uint8_t code = response.data.front();
     if (code != 0) {
         return IpmiRefusal{code, "completion code " + hexadecimal(code)};
     }
-    const std::span<const std::uint8_t> rest = std::span{answer.data}.subspan(1);
+    const std::span<const std::uint8_t> rest = std::span{response.data}.subspan(1);
     if (rest.size() < size) {
-        return IpmiRefusal{std::nullopt, "the answer is too short"};
+        return IpmiRefusal{std::nullopt, "the response is too short"};
     }
     return rest;
 }
 
 /// The value of a parameter: what lies behind its revision, whose number does not
 /// matter as every revision so far can be read as the first.
-IpmiDecoded<std::span<const std::uint8_t>> parameter(const IpmiResponse& answer, std::size_t size) {
-    auto found = payload(answer, transportRequest, lanParametersCommand, 1 + size);
+IpmiDecoded<std::span<const std::uint8_t>> parameter(const IpmiResponse& response,
+                                                     std::size_t size) {
+    auto found = payload(response, transportRequest, lanParametersCommand, 1 + size);
     if (auto* const bytes = std::get_if<std::span<const std::uint8_t>>(&found)) {
         *bytes = bytes->subspan(1, size);
     }
@@ -78,8 +80,8 @@ IpmiRequest getLanAddressSource(std::uint8_t channel) {
     return getLanParameter(channel, addressSourceParameter);
 }
 
-IpmiDecoded<ChannelInfo> decodeChannelInfo(const IpmiResponse& answer) {
-    auto found = payload(answer, appRequest, channelInfoCommand, 2);
+IpmiDecoded<ChannelInfo> decodeChannelInfo(const IpmiResponse& response) {
+    auto found = payload(response, appRequest, channelInfoCommand, 2);
     if (auto* const refusal = std::get_if<IpmiRefusal>(&found)) {
         return std::move(*refusal);
     }
@@ -88,8 +90,8 @@ IpmiDecoded<ChannelInfo> decodeChannelInfo(const IpmiResponse& answer) {
                        .medium = static_cast<std::uint8_t>(bytes[1] & 0x7FU)};
 }
 
-IpmiDecoded<std::optional<IpAddress>> decodeLanAddress(const IpmiResponse& answer) {
-    auto found = parameter(answer, 4);
+IpmiDecoded<std::optional<IpAddress>> decodeLanAddress(const IpmiResponse& response) {
+    auto found = parameter(response, 4);
     if (auto* const refusal = std::get_if<IpmiRefusal>(&found)) {
         return std::move(*refusal);
     }
@@ -101,8 +103,8 @@ IpmiDecoded<std::optional<IpAddress>> decodeLanAddress(const IpmiResponse& answe
     return address;
 }
 
-IpmiDecoded<std::uint8_t> decodeLanAddressSource(const IpmiResponse& answer) {
-    auto found = parameter(answer, 1);
+IpmiDecoded<std::uint8_t> decodeLanAddressSource(const IpmiResponse& response) {
+    auto found = parameter(response, 1);
     if (auto* const refusal = std::get_if<IpmiRefusal>(&found)) {
         return std::move(*refusal);
     }

@@ -13,7 +13,7 @@ namespace ZR::Live {
 
 /// One command to a service processor (IPMI 2.0, chapter 5).
 struct IpmiRequest {
-    std::uint8_t netFn = 0;  ///< even; that of the answer is one more
+    std::uint8_t netFn = 0;  ///< even; that of the response is one more
     std::uint8_t command = 0;
     std::vector<std::uint8_t> data;
 
@@ -29,12 +29,12 @@ struct IpmiResponse {
     bool operator==(const IpmiResponse&) const = default;
 };
 
-/// Why an answer gives no facts.
+/// Why a response gives no facts.
 struct IpmiRefusal {
-    std::optional<std::uint8_t> code;  ///< completion code; nullopt for an answer that is none
+    std::optional<std::uint8_t> code;  ///< completion code; nullopt where the response is malformed
     std::string reason;
 
-    /// Whether the same question may well be answered at another time: the
+    /// Whether the same request may succeed at another time: the
     /// processor is busy or in its start or update, or the way to it failed
     /// (IPMI 2.0, table 5-2).
     [[nodiscard]] bool passing() const noexcept;
@@ -67,14 +67,14 @@ struct ChannelInfo {
 // Any bytes give facts or a reason. What follows the expected bytes does not count:
 // later versions of the commands append to them.
 
-[[nodiscard]] IpmiDecoded<ChannelInfo> decodeChannelInfo(const IpmiResponse& answer);
+[[nodiscard]] IpmiDecoded<ChannelInfo> decodeChannelInfo(const IpmiResponse& response);
 
 /// Parameter 3 of Get LAN Configuration Parameters; nullopt for 0.0.0.0, which means that
 /// the channel has no address.
-[[nodiscard]] IpmiDecoded<std::optional<IpAddress>> decodeLanAddress(const IpmiResponse& answer);
+[[nodiscard]] IpmiDecoded<std::optional<IpAddress>> decodeLanAddress(const IpmiResponse& response);
 
 /// Parameter 4 of Get LAN Configuration Parameters: 0 unspecified, 1 static, 2 DHCP,
 /// 3 loaded by BIOS or system software, 4 another protocol; above 4 reserved.
-[[nodiscard]] IpmiDecoded<std::uint8_t> decodeLanAddressSource(const IpmiResponse& answer);
+[[nodiscard]] IpmiDecoded<std::uint8_t> decodeLanAddressSource(const IpmiResponse& response);
 
 }  // namespace ZR::Live

@@ -14,13 +14,13 @@
 namespace ZR::Live {
 
 /// Knows the service processor, as far as that is possible without ever waiting for
-/// it: a question of one call is answered at a later one. At first the processor is
-/// there without its LAN channel, therefore; and a change of its address shows at
-/// the second call that is more than a minute after the last question.
+/// it: the response to a request of one call is taken at a later one. At first, therefore,
+/// the processor is there without its LAN channel; and a change of its address shows at
+/// the second call that is more than a minute after the last request.
 ///
-/// At most once a minute it is asked, and it is looked whether the machine has one at
-/// all. Answers that fail to come leave what was known; the third time in a row the
-/// LAN channel counts as unknown. Used by one thread at a time.
+/// The processor is asked at most once a minute; whether the machine has one is looked at
+/// equally often. Where responses are missing, what was known stays; after the third time
+/// in a row the LAN channel counts as unknown. Used by one thread at a time.
 class IpmiReader {
   public:
     using Clock = std::function<std::chrono::steady_clock::time_point()>;
@@ -33,15 +33,15 @@ class IpmiReader {
                         Clock clock = std::chrono::steady_clock::now);
 
     /// Whether there is something that the last read() did not give. Does what can be
-    /// done at once: one system call while answers are awaited, none otherwise but
+    /// done at once: one system call while responses are awaited, otherwise none, except
     /// once a minute.
     [[nodiscard]] bool changed();
 
-    /// Whether questions are out that may still be answered.
+    /// Whether requests are out whose responses may still come.
     [[nodiscard]] bool awaiting() const noexcept { return conversation_.has_value(); }
 
-    /// What is known; nullopt when the machine has no service processor. Adds what
-    /// stands in the way of knowing more.
+    /// What is known; nullopt when the machine has no service processor. Adds the reasons
+    /// why no more is known to the diagnostics.
     [[nodiscard]] std::optional<ServiceProcessor> read(std::vector<std::string>& diagnostics);
 
   private:

@@ -11,9 +11,6 @@ namespace {
 using NodeLexicon::AddressSource;
 using NodeLexicon::Properties;
 
-// The names by which the provider knows this computer.
-constexpr const char* description = "BMC";
-constexpr const char* name = "BMC:-1";
 constexpr std::uint8_t dhcp = 2;
 
 /// By IPMI's number (IPMI 2.0, table 23-4). There is none for BOOTP or link-local.
@@ -28,8 +25,8 @@ AddressSource sourceOf(const LanChannel& lan) {
 }  // namespace
 
 void addServiceProcessor(const ServiceProcessor& processor, SnapshotBuilder& tree) {
-    const auto computer = tree.add(Snapshot::none, "ComputerSystem", description);
-    tree.property(Properties::Name, name);
+    const auto computer = tree.add(Snapshot::none, "ComputerSystem", "BMC");
+    tree.property(Properties::Name, "BMC:-1");
     if (!processor.lan) {
         return;
     }

@@ -26,7 +26,7 @@ struct ServiceProcessor {
 
 /// Adds the nodes of a service processor to a machine's tree: a computer, and with a
 /// LAN channel its network and one interface, which is named after the channel: IPMI
-/// has no name for it, and no driver of the kernel gives that one to a link.
+/// has no name for it, and no driver of the kernel gives this name to a link.
 void addServiceProcessor(const ServiceProcessor& processor, SnapshotBuilder& tree);
 
 }  // namespace ZR::Live

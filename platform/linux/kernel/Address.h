@@ -25,7 +25,7 @@ struct Address {
 
 /// Facts of one RTM_NEWADDR message, header included. Any bytes give facts or
 /// nullopt: another or too short a message, an attribute whose length cannot be
-/// true, or no address of IPv4 or IPv6 in it.
+/// true, or without an address of IPv4 or IPv6.
 [[nodiscard]] std::optional<Address> parseAddress(std::span<const std::byte> message);
 
 }  // namespace ZR::Live

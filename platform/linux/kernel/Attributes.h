@@ -64,7 +64,7 @@ class AttributeWalk {
         return true;
     }
 
-    /// Whether the walk ended at bytes that are no attribute.
+    /// Whether the walk ended at bytes that are not an attribute.
     [[nodiscard]] bool malformed() const noexcept { return malformed_; }
 
   private:

@@ -28,7 +28,8 @@ constexpr std::uint32_t directoryEvents = IN_MODIFY | IN_CREATE | IN_MOVED_TO | 
                                           IN_DELETE | IN_ATTRIB | IN_DELETE_SELF | IN_MOVE_SELF;
 constexpr std::uint32_t ancestorEvents = IN_CREATE | IN_MOVED_TO | IN_DELETE_SELF | IN_MOVE_SELF;
 
-// Ends a drain that others keep filling; what is left counts at the next question.
+// The most reads of one drain, so that a flood of events cannot keep a caller here. What is
+// left is read at the next call.
 constexpr int longestDrain = 4096;
 
 int addWatch(int fd, const std::string& directory, std::uint32_t events) {
@@ -142,8 +143,8 @@ void ChangeMonitor::openWatches(std::vector<std::string>& diagnostics) {
     }
 }
 
-/// What one round of watching has come to know. Many places lie in few directories, and
-/// below few that are missing: the kernel is asked once about each.
+/// What one round of watching knows so far. Many places lie in few directories, or below
+/// few missing ones: the kernel is asked about each directory once.
 struct ChangeMonitor::Arming {
     struct Directory {
         int watch = -1;
@@ -152,8 +153,8 @@ struct ChangeMonitor::Arming {
 
     Interests interests;
     std::map<std::string, Directory, std::less<>> watched;
-    /// Missing directories, with the watch above them, which was there before they were
-    /// found missing: when they come, that is told.
+    /// Missing directories, each with the watch of the directory above it. That watch began
+    /// before the directory was found missing, so that its coming is not overlooked.
     std::map<std::string, int, std::less<>> missing;
 
     /// Waits for the nearest missing directory on the way to this one, if one is known.
@@ -198,7 +199,7 @@ void ChangeMonitor::watch(const WatchedPlace& place, Arming& arming,
         notice(known->second.watch);
         return;
     }
-    // Directories may come and go meanwhile, but not for ever.
+    // A directory may come or go between two calls. A few attempts are enough for that.
     for (int attempt = 0; attempt < 8; ++attempt) {
         if (arming.awaits(place.directory)) {
             return;
@@ -215,8 +216,8 @@ void ChangeMonitor::watch(const WatchedPlace& place, Arming& arming,
     }
     const int error = errno;
     if (error == EACCES) {
-        // A directory that may not be read holds nothing that was read either, and
-        // its reader says so.
+        // Nothing was read from a directory that may not be read, and its reader has
+        // reported that.
         return;
     }
     // Anything else, like a limit that was reached, leaves changes unnoticed.
@@ -224,9 +225,10 @@ void ChangeMonitor::watch(const WatchedPlace& place, Arming& arming,
     blind_ = true;
 }
 
-/// Watches the nearest existing ancestor of a directory that was just found missing. What
-/// is missing below it counts as such once it was not there with that watch begun. -1
-/// with errno set when there is nothing to watch.
+/// Watches the nearest existing ancestor of a directory that was just found missing.
+/// `arming.missing` then has the topmost missing directory below it, which was looked for
+/// again after that watch began: if it comes, the watch tells. Returns the watch; -1 with
+/// errno set when there is nothing to watch.
 int ChangeMonitor::watchAncestor(std::string directory, Arming& arming) const {
     const auto await = [&](const std::string& path) {
         const int watch = addWatch(watches_.get(), path, ancestorEvents);
@@ -320,7 +322,7 @@ bool ChangeMonitor::concerns(int watch, std::uint32_t mask, std::string_view nam
     }
     const auto interests = interests_.find(watch);
     if (interests == interests_.end()) {
-        return false;  // the last words of a watch that was given up
+        return false;  // an event of a watch that was removed meanwhile
     }
     if ((mask & IN_IGNORED) != 0) {
         interests_.erase(interests);

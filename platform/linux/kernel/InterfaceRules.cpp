@@ -52,7 +52,7 @@ bool isNetworkInterface(const Link& link, bool addressed) {
         // has no address or is a port of a bridge.
         return addressed && link.slaveKind != "bridge" && link.slaveKind != "openvswitch";
     }
-    // What is left out: tunnels, test devices, vrf, and kinds that nobody knows yet.
+    // What is left out: tunnels, test devices, vrf, and kinds that are not known here.
     return contains(addressHolders, link.kind);
 }
 

@@ -17,7 +17,7 @@ struct CloseSocket {
     }
 };
 
-/// Waits until the socket is readable. Answers an errno, 0 when it is.
+/// Waits until the socket is readable. Returns an errno, 0 when it is.
 int awaitReadable(int fd, Deadline deadline) {
     for (;;) {
         const auto left = std::chrono::duration_cast<std::chrono::milliseconds>(
@@ -63,7 +63,7 @@ class KernelTransport final : public NetlinkTransport {
         if (sent < 0) {
             return errno;
         }
-        // The kernel would say nothing to a part of a question.
+        // The kernel does not respond to a part of a request.
         return static_cast<std::size_t>(sent) == message.size() ? 0 : EMSGSIZE;
     }
 

@@ -18,8 +18,8 @@ struct Datagram {
     std::uint32_t sender = 0;  ///< netlink port of the sender; 0 is the kernel
 };
 
-/// A request socket to the kernel's routing family. What lies above it can thus
-/// be shown everything that a kernel may answer, the rare and the broken too.
+/// A request socket to the kernel's routing family. An interface, so that tests can give
+/// every response that a kernel may give, also rare and broken ones.
 class NetlinkTransport {
   public:
     NetlinkTransport() = default;
@@ -27,10 +27,10 @@ class NetlinkTransport {
     NetlinkTransport& operator=(const NetlinkTransport&) = delete;
     virtual ~NetlinkTransport() = default;
 
-    /// Opens the socket, in place of the one that is open. Answers an errno, 0 for none.
+    /// Opens the socket, in place of the one that is open. Returns an errno, 0 for none.
     [[nodiscard]] virtual int open() = 0;
 
-    /// Sends one message. Answers an errno, 0 for none.
+    /// Sends one message. Returns an errno, 0 for none.
     [[nodiscard]] virtual int send(std::span<const std::byte> message) = 0;
 
     /// Receives one datagram; waits for it until the deadline at most.

@@ -26,7 +26,7 @@ constexpr int attempts = 3;
 constexpr std::size_t firstBufferSize = std::size_t{32} << 10U;
 constexpr std::size_t largestBufferSize = std::size_t{1} << 20U;
 
-/// The errno that the kernel says, which it says negated; EBADMSG where it says none.
+/// The errno in a message of the kernel, which has it negated; EBADMSG where there is none.
 int errorIn(std::optional<std::int32_t> code) {
     return code && *code < 0 && *code != INT32_MIN ? -*code : EBADMSG;
 }
@@ -48,7 +48,7 @@ struct RtnetlinkReader::Outcome {
     };
     End end = End::Failed;
     std::string reason;
-    std::size_t unreadable = 0;  // messages that are no facts
+    std::size_t unreadable = 0;  // messages that cannot be parsed
     bool interrupted = false;
 };
 
@@ -114,11 +114,11 @@ RtnetlinkReader::Outcome RtnetlinkReader::dumpOnce(std::uint16_t request, Parse 
         const Datagram datagram = transport_->receive(buffer_, later(deadline, held_));
         if (datagram.error == ENOBUFS) {
             outcome.end = End::Lost;
-            outcome.reason = "parts of the answer were lost";
+            outcome.reason = "parts of the response were lost";
             return outcome;
         }
         if (datagram.error != 0) {
-            outcome.reason = "no answer: " + reasonOf(datagram.error);
+            outcome.reason = "no response: " + reasonOf(datagram.error);
             return outcome;
         }
         // Any process may send to a netlink port that it guesses.
@@ -129,7 +129,7 @@ RtnetlinkReader::Outcome RtnetlinkReader::dumpOnce(std::uint16_t request, Parse 
                 buffer_.resize(buffer_.size() * 2);
             }
             outcome.end = grows ? End::Lost : End::Failed;
-            outcome.reason = "the answer is longer than the buffer";
+            outcome.reason = "the response is longer than the buffer";
             return outcome;
         }
         if (fromKernel && take(datagram.size, request, parse, facts, outcome)) {
@@ -137,7 +137,7 @@ RtnetlinkReader::Outcome RtnetlinkReader::dumpOnce(std::uint16_t request, Parse 
             return outcome;
         }
         if (std::chrono::steady_clock::now() >= later(deadline, held_)) {
-            outcome.reason = "no complete answer in time";
+            outcome.reason = "no complete response in time";
             return outcome;
         }
     }
@@ -157,7 +157,7 @@ bool RtnetlinkReader::take(std::size_t size, std::uint16_t request, Parse parse,
         const auto bytes = rest.first(message->nlmsg_len);
         rest = rest.subspan(std::min<std::size_t>(NLMSG_ALIGN(bytes.size()), rest.size()));
         if (message->nlmsg_seq != sequence_) {
-            continue;  // the rest of an answer that was given up
+            continue;  // the rest of a response that was given up
         }
         if ((message->nlmsg_flags & NLM_F_DUMP_INTR) != 0) {
             outcome.interrupted = true;
@@ -168,7 +168,7 @@ bool RtnetlinkReader::take(std::size_t size, std::uint16_t request, Parse parse,
                 break;
             case NLMSG_OVERRUN:
                 outcome.end = End::Lost;
-                outcome.reason = "parts of the answer were lost";
+                outcome.reason = "parts of the response were lost";
                 return true;
             case NLMSG_ERROR:
                 if (code && *code == 0) {
@@ -185,7 +185,7 @@ bool RtnetlinkReader::take(std::size_t size, std::uint16_t request, Parse parse,
                 }
                 return true;
             default:
-                // An answer's type is its request's less two.
+                // A response's type is its request's less two.
                 if (message->nlmsg_type != request - 2) {
                     break;
                 }
@@ -216,7 +216,7 @@ int RtnetlinkReader::ask(std::uint16_t request) {
     message->nlmsg_seq = ++sequence_;
     if (request == RTM_GETLINK) {
         ::mnl_nlmsg_put_extra_header(message, sizeof(ifinfomsg));
-        // The counters are a quarter of the answer, and nobody here reads them.
+        // The counters are a quarter of the response, and are not needed.
         ::mnl_attr_put_u32(message, IFLA_EXT_MASK, RTEXT_FILTER_SKIP_STATS);
     } else {
         ::mnl_nlmsg_put_extra_header(message, sizeof(ifaddrmsg));

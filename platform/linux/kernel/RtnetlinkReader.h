@@ -28,11 +28,12 @@ class RtnetlinkReader {
   public:
     explicit RtnetlinkReader(std::unique_ptr<NetlinkTransport> transport = kernelTransport());
 
-    /// Never throws apart from std::bad_alloc. Waits for answers until the deadline at the
-    /// latest. While somebody holds the kernel's lock of all links, as a namespace of a
-    /// thousand bridges does for seconds when it goes, the kernel keeps whoever asks for
-    /// links in the very call that asks. No deadline ends that, and the answer, which then
-    /// is at hand, is not given up for it; but nothing is asked again after the deadline.
+    /// Never throws apart from std::bad_alloc. Waits for responses until the deadline.
+    ///
+    /// Sending a request may itself wait, for as long as another process holds the kernel's
+    /// lock of all links: the end of a namespace with a thousand bridges holds it for
+    /// seconds. No deadline ends that wait. It moves the deadline, so that the response,
+    /// which is then there, is still read; but no request is sent again after the deadline.
     [[nodiscard]] NetworkState read(Deadline deadline);
 
   private:

@@ -177,7 +177,7 @@ TEST_F(DecideTest, WithoutAnAddressThePropertyIsLeftOut) {
     EXPECT_EQ(tree->find(interfaceNode(*tree, "eth0"), Properties::IPv4Address), nullptr);
 }
 
-TEST_F(DecideTest, IPv6AddressesAreNoIPv4Address) {
+TEST_F(DecideTest, IPv6AddressesAreNotAnIPv4Address) {
     address("2001:db8::1");
     EXPECT_EQ(ipv4(), PropertyValue{});
 }
@@ -257,7 +257,7 @@ TEST_F(DecideTest, ALeaseByNameFollowsARename) {
     lease().interfaceName = "before"_name;
     EXPECT_EQ(servers(), PropertyValue{Servers{server}});
     EXPECT_EQ(source(), number(1));
-    // Two links with the address: nobody can tell which of them was called so.
+    // Two links with the address: nothing tells which of them was called so.
     Link twin = link();
     twin.ifindex = 5;
     twin.name = "eth5"_name;
@@ -562,7 +562,7 @@ TEST_F(DecideTest, AnAddressOfTheSystemsStartStaysWhatItWas) {
     former.expires = now - 1;
     EXPECT_EQ(source(), number(1));
     EXPECT_EQ(servers(), PropertyValue{Servers{}}) << "it may be another's by now";
-    EXPECT_EQ(enabled(), PropertyValue{false}) << "nobody renews it";
+    EXPECT_EQ(enabled(), PropertyValue{false}) << "no client renews it";
     former.bootp = true;
     EXPECT_EQ(source(), number(2));
     address("192.0.2.1");
@@ -651,7 +651,7 @@ TEST_F(DecideTest, ADecisionNamesItsReasonAndWhereItIsFrom) {
     EXPECT_EQ(origins().at(Properties::DHCPEnabled),
               "ifcfg /etc/sysconfig/network/ifcfg-eth0: the configuration that is kept for the "
               "link");
-    EXPECT_EQ(decide(facts_, now)->origin(2, Properties::Name), "") << "nobody asked";
+    EXPECT_EQ(decide(facts_, now)->origin(2, Properties::Name), "") << "it was not asked for";
 }
 
 TEST_F(DecideTest, TenThousandInterfacesTakeNoQuadraticTime) {

@@ -80,7 +80,7 @@ class Watched {
 };
 
 /// Starts the client, which goes to the background with its lease. It writes its
-/// process number only then, and nobody can end it properly before.
+/// process number only then, and it cannot be ended properly before.
 void start(const std::string& options) {
     run(client + std::string{" -1 -pf /run/client.pid "} + options + " eth1 < /dev/null");
     EXPECT_TRUE(eventually([] { return !File::read("/run/client.pid").value_or("").empty(); }));

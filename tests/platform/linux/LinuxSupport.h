@@ -18,7 +18,7 @@
 #include <string_view>
 #include <vector>
 
-#include "clients/ClientFacts.h"
+#include "facts/ClientFacts.h"
 #include "formats/InterfaceName.h"
 #include "formats/IpAddress.h"
 #include "formats/Roots.h"

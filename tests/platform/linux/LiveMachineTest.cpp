@@ -1,4 +1,4 @@
-// Files laid out in a directory, and prepared answers in place of the kernel's: the
+// Files laid out in a directory, and prepared responses in place of the kernel's: the
 // whole way from bytes to nodes, for states that no test machine can be put into.
 // KernelTest.cpp and DhcpLifeTest.cpp go the same way with a real kernel and clients.
 
@@ -43,16 +43,16 @@ class LiveMachineTest : public testing::Test {
             {addressMessage(ifindex, bytes), Message{NLMSG_DONE, NLM_F_MULTI, std::int32_t{0}}}}};
     }
     static std::vector<Step> refused(int error) {
-        nlmsgerr answer{};
-        answer.error = -error;
-        return {Step{{Message{NLMSG_ERROR, 0, answer}}}};
+        nlmsgerr response{};
+        response.error = -error;
+        return {Step{{Message{NLMSG_ERROR, 0, response}}}};
     }
 
-    LiveMachine& open(std::deque<std::vector<Step>> answers) {
+    LiveMachine& open(std::deque<std::vector<Step>> responses) {
         Surroundings surroundings;
         std::filesystem::create_directories(root_.path("/proc/thread-self/ns"));
         surroundings.roots = {.files = root_.path(), .proc = root_.path("/proc")};
-        surroundings.transport = std::make_unique<ScriptedTransport>(std::move(answers));
+        surroundings.transport = std::make_unique<ScriptedTransport>(std::move(responses));
         surroundings.realProcesses = false;
         surroundings.uptime = [this] { return uptime_; };
         surroundings.askNetworkd = [this](auto /*deadline*/) {
@@ -109,16 +109,16 @@ TEST_F(LiveMachineTest, NetworkdIsAskedOnlyWhereItHasLinks) {
     EXPECT_EQ(asked_, 0);
 }
 
-TEST_F(LiveMachineTest, ANetworkdThatDoesNotAnswerIsLeftAloneForAWhile) {
+TEST_F(LiveMachineTest, ANetworkdThatDoesNotRespondIsLeftAloneForAWhile) {
     root_.write("/run/systemd/netif/links/2", sample("networkd/run-systemd-netif-links-2.txt"));
     root_.write("/run/systemd/netif/leases/2", sample("networkd/run-systemd-netif-leases-2.txt"));
     networkd_.reason = "too busy";
-    std::deque<std::vector<Step>> answers;
+    std::deque<std::vector<Step>> responses;
     for (int i = 0; i < 4; ++i) {
-        answers.push_back(links(1));
-        answers.push_back(address(2, {198, 51, 100, 110}));
+        responses.push_back(links(1));
+        responses.push_back(address(2, {198, 51, 100, 110}));
     }
-    LiveMachine& machine = open(std::move(answers));
+    LiveMachine& machine = open(std::move(responses));
     EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),
               PropertyValue{Servers{"198.51.100.1"}})
         << "its files tell it, too";
@@ -129,7 +129,7 @@ TEST_F(LiveMachineTest, ANetworkdThatDoesNotAnswerIsLeftAloneForAWhile) {
     networkd_ = {.json = "{", .reason = ""};
     static_cast<void>(machine.read());
     EXPECT_EQ(asked_, 2);
-    EXPECT_EQ(diagnostics_.back(), "cannot use what systemd-networkd says: no JSON object");
+    EXPECT_EQ(diagnostics_.back(), "cannot use what systemd-networkd says: not a JSON object");
 }
 
 TEST_F(LiveMachineTest, CapturedDhclientLeaseLivesUntilItsEnd) {
@@ -253,12 +253,12 @@ TEST_F(LiveMachineTest, ATroubleThatReturnsIsToldAgain) {
     EXPECT_EQ(diagnostics_.size(), 2U);
 }
 
-TEST_F(LiveMachineTest, AKernelThatDoesNotAnswerHoldsNobodyUp) {
+TEST_F(LiveMachineTest, AKernelThatDoesNotRespondHoldsNoCallerUp) {
     LiveMachine& machine = open({links(1), address(2, {192, 0, 2, 1})});
     EXPECT_THAT(interfaceNames(*machine.read()), ElementsAre("eth1"));
     const auto tree = machine.read();
     EXPECT_THAT(interfaceNames(*tree), IsEmpty()) << "what was once read is not shown again";
-    EXPECT_THAT(diagnostics_, ElementsAre(HasSubstr("network links: no answer: ")));
+    EXPECT_THAT(diagnostics_, ElementsAre(HasSubstr("network links: no response: ")));
     EXPECT_THAT(tree->remarks(), testing::ElementsAreArray(diagnostics_));
     EXPECT_TRUE(machine.changed()) << "to be read again";
 }
@@ -277,12 +277,12 @@ TEST_F(LiveMachineTest, ASocketThatAloneTellsOfAClientIsAskedAboutEachTime) {
     const std::string udp = "/proc/thread-self/net/udp";
     const std::string line =
         "1: 010200C0:0044 630200C0:0043 01 00000000:00000000 00:00000000 00000000 0\n";
-    std::deque<std::vector<Step>> answers;
+    std::deque<std::vector<Step>> responses;
     for (int i = 0; i < 4; ++i) {
-        answers.push_back(links(1));
-        answers.push_back(address(2, {192, 0, 2, 1}));
+        responses.push_back(links(1));
+        responses.push_back(address(2, {192, 0, 2, 1}));
     }
-    LiveMachine& machine = open(std::move(answers));
+    LiveMachine& machine = open(std::move(responses));
     root_.write(udp, line);
     EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),
               PropertyValue{Servers{"192.0.2.99"}});
@@ -343,12 +343,12 @@ TEST_F(LiveMachineTest, EveryPlaceThatItReadsIsWatched) {
     root_.write("/etc/network/interfaces", "source interfaces.d/*\n");
     root_.write("/run/systemd/netif/links/2",
                 "ADMIN_STATE=configured\nNETWORK_FILE=/etc/systemd/network/a.network\n");
-    std::deque<std::vector<Step>> answers;
+    std::deque<std::vector<Step>> responses;
     for (int i = 0; i < 100; ++i) {
-        answers.push_back(links(1));
-        answers.push_back(address(2, {192, 0, 2, 1}));
+        responses.push_back(links(1));
+        responses.push_back(address(2, {192, 0, 2, 1}));
     }
-    LiveMachine& machine = open(std::move(answers));
+    LiveMachine& machine = open(std::move(responses));
     static_cast<void>(machine.read());
     EXPECT_FALSE(machine.changed());
     std::vector<std::string> files{"/srv/own.leases", "/etc/systemd/network/a.network",

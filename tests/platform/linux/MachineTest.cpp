@@ -102,7 +102,7 @@ TEST_F(MachineTest, AClientThatNamesNoLinkMeansTheOneThatHasItsAddress) {
     EXPECT_EQ(machine().interfaces()[1].leases.size(), 0U) << "two links have it";
 }
 
-TEST_F(MachineTest, WhatTheKernelWasGivenIsTheOnlyAddressThatNobodyElseSpeaksFor) {
+TEST_F(MachineTest, WhatTheKernelWasGivenIsTheOnlyAddressThatNothingElseTellsOf) {
     facts_.clients.boot = {.bootp = true, .server = "192.0.2.1"_ip, .origin = "pnp"};
     for (Address& address : facts_.addresses) {
         address.validLifetime = Address::infinite;

@@ -25,19 +25,19 @@ TEST(Precedence, RowsOfAPropertyStandTogether) {
     EXPECT_EQ(finished.size(), NodeLexicon::properties.size());
 }
 
-TEST(Precedence, TheLastRowOfEachPropertyAnswersForAnyInterface) {
+TEST(Precedence, TheLastRowOfEachPropertyFindsAValueForAnyInterface) {
     const Link link{.ifindex = 1, .name = "e"_name, .kind = "", .slaveKind = "", .carrier = {}};
-    std::map<Properties, bool> answered;
+    std::map<Properties, bool> found;
     for (const DecisionRow& row : precedence()) {
         InterfaceView view;
         view.link = &link;
-        answered[row.property] = row.answer(view).has_value();
+        found[row.property] = row.find(view).has_value();
     }
     // An interface need not have an address; all else is always told.
-    EXPECT_FALSE(answered.at(Properties::IPv4Address));
-    answered.erase(Properties::IPv4Address);
-    for (const auto& [property, answers] : answered) {
-        EXPECT_TRUE(answers) << static_cast<int>(property);
+    EXPECT_FALSE(found.at(Properties::IPv4Address));
+    found.erase(Properties::IPv4Address);
+    for (const auto& [property, has] : found) {
+        EXPECT_TRUE(has) << static_cast<int>(property);
     }
 }
 

@@ -24,7 +24,7 @@ struct Step {
     bool truncated = false;
     bool forEver = false;
     std::uint32_t sender = 0;
-    std::optional<std::uint32_t> sequence = std::nullopt;  // else that of the question
+    std::optional<std::uint32_t> sequence = std::nullopt;  // else that of the request
 
     static Step failing(int error) {
         Step step{{}};
@@ -53,16 +53,16 @@ struct Step {
     }
 };
 
-/// Answers each question with the next of its prepared answers, then is silent.
+/// Responds to each request with the next of its prepared responses, then is silent.
 class ScriptedTransport final : public NetlinkTransport {
   public:
-    explicit ScriptedTransport(std::deque<std::vector<Step>> answers)
-        : answers_(std::move(answers)) {}
+    explicit ScriptedTransport(std::deque<std::vector<Step>> responses)
+        : responses_(std::move(responses)) {}
 
     void refuseToOpen(int error) { openError_ = error; }
-    /// Keeps whoever asks in the question for so long, as a kernel does whose links are
+    /// Keeps the caller in the request for so long, as a kernel does whose links are
     /// being changed by others.
-    void holdQuestions(std::chrono::milliseconds time) { held_ = time; }
+    void holdRequests(std::chrono::milliseconds time) { held_ = time; }
     [[nodiscard]] int opened() const { return opened_; }
     [[nodiscard]] int asked() const { return asked_; }
     [[nodiscard]] std::size_t largestBuffer() const { return largestBuffer_; }
@@ -76,13 +76,13 @@ class ScriptedTransport final : public NetlinkTransport {
     int send(std::span<const std::byte> message) override {
         ++asked_;
         std::this_thread::sleep_for(held_);
-        nlmsghdr question{};
-        std::memcpy(&question, message.data(), sizeof question);
-        sequence_ = question.nlmsg_seq;
+        nlmsghdr request{};
+        std::memcpy(&request, message.data(), sizeof request);
+        sequence_ = request.nlmsg_seq;
         pending_.clear();
-        if (!answers_.empty()) {
-            pending_.assign(answers_.front().begin(), answers_.front().end());
-            answers_.pop_front();
+        if (!responses_.empty()) {
+            pending_.assign(responses_.front().begin(), responses_.front().end());
+            responses_.pop_front();
         }
         return 0;
     }
@@ -113,7 +113,7 @@ class ScriptedTransport final : public NetlinkTransport {
     }
 
   private:
-    std::deque<std::vector<Step>> answers_;
+    std::deque<std::vector<Step>> responses_;
     std::deque<Step> pending_;
     int openError_ = 0;
     std::chrono::milliseconds held_{0};

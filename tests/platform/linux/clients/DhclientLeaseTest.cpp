@@ -3,7 +3,7 @@
 #include <gtest/gtest.h>
 
 #include "LinuxSupport.h"
-#include "clients/Lease.h"
+#include "facts/Lease.h"
 
 namespace ZR::Live {
 namespace {

@@ -53,7 +53,7 @@ TEST(DhclientArguments, AsNetworkManagerStartsIt) {
               process({"eth1"_name}, "/var/lib/NetworkManager/dhclient-1-eth1.lease"));
 }
 
-TEST(DhclientArguments, ValuesOfOptionsAreNoInterfaces) {
+TEST(DhclientArguments, ValuesOfOptionsAreNotInterfaces) {
     EXPECT_EQ(
         parse({"dhclient", "-6", "-e", "A=b", "-s", "192.0.2.1", "-g", "192.0.2.2", "-p", "1068",
                "-D", "LL", "--dad-wait-time", "3", "-H", "host", "-w", "eth1", "eth2"}),
@@ -69,7 +69,7 @@ TEST(DhclientArguments, AProcessWithoutArgumentsIsNone) {
     EXPECT_EQ(parse({}), std::nullopt);
 }
 
-TEST(DhclientArguments, AValueThatIsMissingIsNoTrouble) {
+TEST(DhclientArguments, AValueThatIsMissingIsEmpty) {
     EXPECT_EQ(parse({"dhclient", "-lf"}), process({}));
 }
 
@@ -235,7 +235,7 @@ TEST_F(DhclientTest, ALeaseFileNamedRelativelyIsNotGuessed) {
     EXPECT_THAT(facts.places, IsEmpty());
 }
 
-TEST_F(DhclientTest, AnythingButAFileIsReportedAndHangsNobody) {
+TEST_F(DhclientTest, AnythingButAFileIsReportedAndHangsNoReader) {
     std::filesystem::create_directories(root_.path("/var/lib/dhcp"));
     ASSERT_EQ(::mkfifo(root_.path("/var/lib/dhcp/dhclient.leases").c_str(), 0600), 0);
     const ClientFacts facts = read();

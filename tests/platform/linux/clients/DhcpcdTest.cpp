@@ -30,7 +30,7 @@ TEST(DhcpcdArguments, ARunningOneSaysWhatItDoes) {
     EXPECT_EQ(parse({"dhcpcd: [master] [ip4]"}), process({}));
 }
 
-TEST(DhcpcdArguments, ItsHelpersAreNoClients) {
+TEST(DhcpcdArguments, ItsHelpersAreNotClients) {
     for (const char* title :
          {"dhcpcd: [privileged proxy] eth1 [ip4] [ip6]", "dhcpcd: [network proxy] 198.51.100.7",
           "dhcpcd: [control proxy]", "dhcpcd: [BPF ARP] eth1 198.51.100.107", "dhcpcd: "}) {
@@ -46,7 +46,7 @@ TEST(DhcpcdArguments, BeforeItSaysSoItsArgumentsTell) {
     EXPECT_EQ(parse({}), std::nullopt);
 }
 
-TEST(DhcpcdArguments, ACommandToAnotherOneIsNoClient) {
+TEST(DhcpcdArguments, ACommandToAnotherOneIsNotAClient) {
     for (const char* command : {"-k", "-x", "-n", "-U", "--release", "--exit", "--dumplease"}) {
         EXPECT_EQ(parse({"dhcpcd", command, "eth1"}), std::nullopt) << command;
     }
@@ -144,7 +144,7 @@ TEST_F(DhcpcdTest, AnInfiniteLeaseAndBootpHaveNoEnd) {
     EXPECT_EQ(read().leases.at(0).server, std::nullopt);
 }
 
-TEST_F(DhcpcdTest, AReplyWithoutALeaseTimeIsNoLease) {
+TEST_F(DhcpcdTest, AReplyWithoutALeaseTimeIsNotALease) {
     const std::string inform =
         sample("dhcpcd-10/eth1.lease").substr(0, 240) + std::string{"\x35\x01\x05\xff"};
     write("/var/lib/dhcpcd/eth1.lease", inform);
@@ -157,7 +157,7 @@ TEST_F(DhcpcdTest, AnEmptyFileIsJustBeingWritten) {
     EXPECT_EQ(read(), ClientFacts{});
 }
 
-TEST_F(DhcpcdTest, AFileThatIsNoPacketIsReported) {
+TEST_F(DhcpcdTest, AFileThatIsNotAPacketIsReported) {
     write("/var/lib/dhcpcd/eth1.lease", "text");
     write("/var/lib/dhcpcd/eth1.lease6", "text");
     EXPECT_THAT(read().leases, IsEmpty());

@@ -36,7 +36,7 @@ TEST(IpconfigResult, NewerVersionsCallTheProtocolOtherwise) {
     EXPECT_EQ(parseIpconfig("IPV4PROTO='none'\n").protocol, Protocol::Other);
 }
 
-TEST(IpconfigResult, AllZerosAreNoAddress) {
+TEST(IpconfigResult, AllZerosAreNotAnAddress) {
     const IpconfigResult result = parseIpconfig("IPV4ADDR='0.0.0.0'\nROOTSERVER='0.0.0.0'\n");
     EXPECT_EQ(result.address, std::nullopt);
     EXPECT_EQ(result.server, std::nullopt);
@@ -74,7 +74,7 @@ TEST_F(IpconfigTest, ALeaseOutlivesItsEndAndOneOfBootpHasNone) {
     EXPECT_THAT(read().leases, ElementsAre(lease(true, Lease::never)));
 }
 
-TEST_F(IpconfigTest, AnAddressThatWasGivenByHandIsNoLease) {
+TEST_F(IpconfigTest, AnAddressThatWasGivenByHandIsNotALease) {
     write("DEVICE=eth1\nPROTO='none'\nIPV4ADDR='192.0.2.7'\n");
     EXPECT_THAT(read().leases, IsEmpty());
     write("DEVICE='a b'\nPROTO='dhcp'\nIPV4ADDR='192.0.2.7'\n");

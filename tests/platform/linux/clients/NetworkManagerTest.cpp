@@ -220,7 +220,7 @@ TEST_F(NetworkManagerTest, AWholeLeaseFileOfOlderVersionsIsALease) {
                                                  .origin = root_.path(file)}));
 }
 
-TEST_F(NetworkManagerTest, FilesThatAreNoDevicesAreNotLookedAt) {
+TEST_F(NetworkManagerTest, FilesThatAreNotDevicesAreNotLookedAt) {
     root_.write("/run/NetworkManager/devices/2.tmp", "[device]\nmanaged=true\n");
     root_.write("/run/NetworkManager/devices/.3", "[device]\nmanaged=true\n");
     EXPECT_THAT(read().managements, IsEmpty());

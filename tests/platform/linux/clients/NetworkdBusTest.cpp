@@ -63,7 +63,7 @@ TEST(NetworkdDescription, OfAllLinksAtOnce) {
         ElementsAre(address("127.0.0.1"_ip, "foreign", {}, 1), address("192.0.2.7"_ip, "static")));
 }
 
-TEST(NetworkdDescription, WhatIsNoAddressIsSkipped) {
+TEST(NetworkdDescription, WhatIsNotAnAddressIsSkipped) {
     EXPECT_THAT(parse(R"({"Index":2,"Addresses":[7,{},{"Family":2},{"Family":2,"Address":"x"},
         {"Family":2,"Address":[1,2,3]},{"Family":2,"Address":[1,2,3,256]},
         {"Family":2,"Address":[1,2,3,-4]},{"Family":10,"Address":[1,2,3,4]},
@@ -118,27 +118,27 @@ TEST(AddNetworkdDescription, AddsAddressesThatAreStaticOnce) {
     EXPECT_THAT(facts.leases, IsEmpty());
 }
 
-/// The answer of a machine whose system bus is at an address; in a process of its own,
+/// The response of a machine whose system bus is at an address; in a process of its own,
 /// for the address is given by the environment.
-std::string answerOf(const std::string& bus, std::chrono::milliseconds time) {
+std::string responseOf(const std::string& bus, std::chrono::milliseconds time) {
     const auto result = inChild([&] {
         ::setenv("DBUS_SYSTEM_BUS_ADDRESS", bus.c_str(), 1);
         const auto start = std::chrono::steady_clock::now();
-        const NetworkdResponse answer = askNetworkd(start + time);
+        const NetworkdResponse response = askNetworkd(start + time);
         const bool late = std::chrono::steady_clock::now() - start > std::chrono::seconds{5};
-        return answer.json + '|' + answer.reason + (late ? " (late)" : "");
+        return response.json + '|' + response.reason + (late ? " (late)" : "");
     });
     return result.output;
 }
 
-TEST(AskNetworkd, WithoutABusNobodyIsAsked) {
+TEST(AskNetworkd, WithoutABusNetworkdIsNotAsked) {
     const TemporaryDirectory directory;
-    EXPECT_EQ(answerOf("unix:path=" + directory.path("/none"), std::chrono::milliseconds{100}),
+    EXPECT_EQ(responseOf("unix:path=" + directory.path("/none"), std::chrono::milliseconds{100}),
               "|");
 }
 
-TEST(AskNetworkd, ABusThatNeverAnswersHoldsNobodyUp) {
-    // Connections wait in the queue of a socket that nobody takes them from.
+TEST(AskNetworkd, ABusThatNeverRespondsHoldsNoCallerUp) {
+    // Connections wait in the queue of a socket, and are never accepted.
     const TemporaryDirectory directory;
     const std::string path = directory.path("/bus");
     const UniqueFd listener{::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0)};
@@ -149,7 +149,7 @@ TEST(AskNetworkd, ABusThatNeverAnswersHoldsNobodyUp) {
     const auto* const generic = static_cast<const sockaddr*>(static_cast<const void*>(&name));
     ASSERT_EQ(::bind(listener.get(), generic, sizeof name), 0);
     ASSERT_EQ(::listen(listener.get(), 8), 0);
-    EXPECT_EQ(answerOf("unix:path=" + path, std::chrono::milliseconds{50}),
+    EXPECT_EQ(responseOf("unix:path=" + path, std::chrono::milliseconds{50}),
               "|systemd-networkd cannot be asked: Connection timed out");
 }
 

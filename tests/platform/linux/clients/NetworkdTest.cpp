@@ -132,7 +132,7 @@ TEST_F(NetworkdTest, ADropInOfTheAdministratorHidesItsNamesake) {
     EXPECT_EQ(read().managements.at(0).dhcp4, true);
 }
 
-TEST_F(NetworkdTest, FilesThatAreNoIndexesAreNotRead) {
+TEST_F(NetworkdTest, FilesThatAreNotIndexesAreNotRead) {
     link("2x", "ADMIN_STATE=configured\n");
     link(".#2", "ADMIN_STATE=configured\n");
     root_.write("/run/systemd/netif/leases/-1", "ADDRESS=192.0.2.1\n");
@@ -144,7 +144,7 @@ TEST_F(NetworkdTest, ALeaseWithoutAnAddressIsNone) {
     EXPECT_THAT(read().leases, IsEmpty());
 }
 
-TEST_F(NetworkdTest, ANetworkFileThatIsNoFileIsReported) {
+TEST_F(NetworkdTest, ANetworkFileThatIsNotAFileIsReported) {
     link("2", "ADMIN_STATE=configured\nNETWORK_FILE=/etc/systemd/network\n");
     std::filesystem::create_directories(root_.path("/etc/systemd/network"));
     EXPECT_EQ(read().diagnostics.size(), 1U);

@@ -64,7 +64,7 @@ TEST_F(ProcessesTest, AClientOfAnUnknownNamespaceIsNotTrusted) {
     EXPECT_THAT(read().diagnostics, IsEmpty());
 }
 
-TEST_F(ProcessesTest, WithoutAnOwnNamespaceNobodyIsTrusted) {
+TEST_F(ProcessesTest, WithoutAnOwnNamespaceNoClientIsTrusted) {
     std::filesystem::remove_all(proc_.path("/thread-self"));
     add("17", "dhclient", commandLine_, nullptr);
     EXPECT_THAT(read().processes, IsEmpty());
@@ -137,7 +137,7 @@ TEST_F(ProcessesTest, AClientWhoseNamespaceIsForbiddenIsReported) {
               "0 processes; cannot tell the links of process 17 (dhclient): Permission denied");
 }
 
-TEST_F(ProcessesTest, WhatIsNoProcessIsNotLookedAt) {
+TEST_F(ProcessesTest, WhatIsNotAProcessIsNotLookedAt) {
     add("self", "dhclient", commandLine_);
     add("0", "dhclient", commandLine_);
     std::filesystem::create_directories(proc_.path("/21"));

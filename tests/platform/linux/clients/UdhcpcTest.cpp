@@ -98,7 +98,7 @@ TEST_F(UdhcpcTest, AnInfiniteLeaseNeverEnds) {
     EXPECT_EQ(read().leases.at(0).server, std::nullopt);
 }
 
-TEST_F(UdhcpcTest, AnIncompleteFileIsNoLease) {
+TEST_F(UdhcpcTest, AnIncompleteFileIsNotALease) {
     for (const char* content :
          {"", "ip=192.0.2.7\n", "lease=600\n", "ip=x\nlease=600\n", "ip=192.0.2.7\nlease=-1\n"}) {
         write(content);

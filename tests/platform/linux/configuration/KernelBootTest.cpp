@@ -15,14 +15,14 @@ TEST(KernelBoot, TheProtocolStandsInTheFirstLine) {
               (BootResponse{.bootp = true, .server = "192.0.2.99"_ip, .origin = ""}));
 }
 
-TEST(KernelBoot, WhoeverWasToldItsAddressAskedNobody) {
+TEST(KernelBoot, AKernelThatWasToldItsAddressAskedNoServer) {
     for (const char* text : {"#MANUAL\n", "#MANUAL\nbootserver 192.0.2.99\n", "#PROTO: RARP\n", "",
                              "DHCP\n", "bootserver 192.0.2.99\n#DHCP\n"}) {
         EXPECT_EQ(parseKernelBoot(text), std::nullopt) << text;
     }
 }
 
-TEST(KernelBoot, AServerThatIsNoAddressIsNone) {
+TEST(KernelBoot, AServerThatIsNotAnAddressIsNone) {
     EXPECT_EQ(parseKernelBoot("#DHCP\nbootserver nobody"),
               (BootResponse{.bootp = false, .server = {}, .origin = ""}));
 }

@@ -13,7 +13,7 @@ namespace {
 using testing::ElementsAre;
 using testing::IsEmpty;
 
-TEST(Files, AbsentFilesAndDirectoriesAreNoDiagnostic) {
+TEST(Files, AbsentFilesAndDirectoriesGiveNoDiagnostic) {
     const TemporaryDirectory root;
     std::vector<std::string> diagnostics;
     EXPECT_EQ(readOptionalFile(root.path("/none"), diagnostics), std::nullopt);

@@ -25,7 +25,7 @@ TEST(KeyFile, KeysBelongToTheSectionAboveThem) {
                 ElementsAre("|a|1", "one|b|2", "two|c|", "two|d|x=y"));
 }
 
-TEST(KeyFile, CommentsAndWhatIsNoPairAreSkipped) {
+TEST(KeyFile, CommentsAndWhatIsNotAPairAreSkipped) {
     EXPECT_THAT(keys("# a=1\n; b=2\n\nnothing\n[half\n"), IsEmpty());
 }
 

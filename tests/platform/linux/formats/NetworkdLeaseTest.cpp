@@ -34,7 +34,7 @@ TEST(NetworkdLease, CapturedInfiniteByVersion257) {
                              .lifetime = infiniteTime}));
 }
 
-TEST(NetworkdLease, WhatIsNoAddressOrTimeIsLeftOut) {
+TEST(NetworkdLease, WhatIsNotAnAddressOrTimeIsLeftOut) {
     EXPECT_EQ(parseNetworkdLease("ADDRESS=host\nSERVER_ADDRESS=1.2.3\nT1=soon\nLIFETIME=\n\0x=\n"),
               NetworkdLease{});
 }

@@ -34,7 +34,7 @@ TEST(OptionWalk, LongNamesTakeTheirValueEitherWay) {
                 ElementsAre("interface:eth1", "interface:eth2", "quiet:", "other:x"));
 }
 
-TEST(OptionWalk, WhatIsNoOptionIsAnOperand) {
+TEST(OptionWalk, WhatIsNotAnOptionIsAnOperand) {
     EXPECT_THAT(walk({"eth1", "-", "", "--", "-b", "--x"}),
                 ElementsAre("operand:eth1", "operand:-", "operand:", "operand:-b", "operand:--x"));
 }

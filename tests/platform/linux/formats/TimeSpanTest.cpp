@@ -22,7 +22,7 @@ TEST(TimeSpan, BothFormsOfInfinity) {
     EXPECT_EQ(parseTimeSpan("4294967295"), infiniteTime);
 }
 
-TEST(TimeSpan, WhatIsNoTimeSpanIsNone) {
+TEST(TimeSpan, WhatIsNotATimeSpanIsNone) {
     for (const char* text :
          {"", " ", "min", "1fortnight", "-1", "1.5h", "1 2x", "99999999999999999",
           "99999999999999999999999", "infinity 1s", "18446744073709551615us 1us"}) {

@@ -46,7 +46,7 @@ class IpmiConversationTest : public testing::Test {
 
 TEST_F(IpmiConversationTest, UsualChannelTakesOneRound) {
     begin(ScriptedProcessor::withLan(1, 2, leased));
-    EXPECT_EQ(processor_.received, 0) << "nobody is kept for answers that cannot be there";
+    EXPECT_EQ(processor_.received, 0) << "no caller waits for responses that cannot be there";
     EXPECT_EQ(later(1ms), State::Finished);
     EXPECT_EQ(conversation_->lan(), (LanChannel{1, std::uint8_t{2}, "198.51.100.77"_ip}));
     EXPECT_THAT(conversation_->diagnostics(), IsEmpty());
@@ -64,7 +64,7 @@ TEST_F(IpmiConversationTest, AnotherChannelIsFoundAmongAll) {
     EXPECT_EQ(asked().size(), 3U + 11U + 2U);
 }
 
-TEST_F(IpmiConversationTest, OfSeveralChannelsTheFirstCountsInWhateverOrderTheyAnswer) {
+TEST_F(IpmiConversationTest, OfSeveralChannelsTheFirstCountsInWhateverOrderTheyRespond) {
     ScriptedProcessor processor = ScriptedProcessor::withLan(8, 2, leased);
     processor.channel(3, 4);
     processor.parameter(3, 4, {1});
@@ -73,7 +73,7 @@ TEST_F(IpmiConversationTest, OfSeveralChannelsTheFirstCountsInWhateverOrderTheyA
     processor_.silent = true;
     EXPECT_EQ(later(1ms), State::Underway);
     processor_.silent = false;
-    // The questions of the search were taken in silence: answer them now, last first.
+    // The requests of the search had no response so far: give them now, last first.
     const auto search = processor_.asked;
     for (std::size_t i = search.size(); i-- > 3;) {
         ASSERT_EQ(transport_.send(search[i].first, search[i].second), 0);
@@ -84,21 +84,21 @@ TEST_F(IpmiConversationTest, OfSeveralChannelsTheFirstCountsInWhateverOrderTheyA
 
 TEST_F(IpmiConversationTest, ThePresentChannelIsAskedForByItsOwnNumber) {
     ScriptedProcessor processor = ScriptedProcessor::withLan(0xd, 2, leased);
-    processor.answers[{0x06, 0x42, 0x0e}] = processor.answers[{0x06, 0x42, 0x0d}];
+    processor.responses[{0x06, 0x42, 0x0e}] = processor.responses[{0x06, 0x42, 0x0d}];
     begin(std::move(processor));
     EXPECT_EQ(later(1ms), State::Finished);
     EXPECT_EQ(conversation_->lan(), (LanChannel{0xd, std::uint8_t{2}, "198.51.100.77"_ip}));
 }
 
-TEST_F(IpmiConversationTest, AnAnswerAboutAnotherChannelIsNotBelieved) {
+TEST_F(IpmiConversationTest, AResponseAboutAnotherChannelIsNotBelieved) {
     ScriptedProcessor processor = ScriptedProcessor::withLan(1, 2, leased);
-    processor.answers[{0x06, 0x42, 1}][1] = 2;
+    processor.responses[{0x06, 0x42, 1}][1] = 2;
     begin(std::move(processor));
     EXPECT_EQ(later(1ms), State::Finished);
     EXPECT_EQ(conversation_->lan(), std::nullopt);
 }
 
-TEST_F(IpmiConversationTest, NoLanChannelIsAnAnswerToo) {
+TEST_F(IpmiConversationTest, NoLanChannelIsAResponseToo) {
     ScriptedProcessor processor;
     processor.channel(1, 1);
     begin(std::move(processor));
@@ -130,7 +130,7 @@ TEST_F(IpmiConversationTest, AnUnsupportedParameterIsJustNotTold) {
     EXPECT_THAT(conversation_->diagnostics(), IsEmpty());
 }
 
-TEST_F(IpmiConversationTest, OtherRefusalsAndBrokenAnswersAreReported) {
+TEST_F(IpmiConversationTest, OtherRefusalsAndBrokenResponsesAreReported) {
     ScriptedProcessor processor = ScriptedProcessor::withLan(1, 2, leased);
     processor.refuseParameter(1, 4, 0xd4);
     processor.parameter(1, 3, {198, 51});
@@ -138,13 +138,13 @@ TEST_F(IpmiConversationTest, OtherRefusalsAndBrokenAnswersAreReported) {
     EXPECT_EQ(later(1ms), State::Finished);
     EXPECT_EQ(conversation_->lan(), (LanChannel{1, std::nullopt, std::nullopt}));
     EXPECT_THAT(conversation_->diagnostics(), ElementsAre("address source: completion code 0xd4",
-                                                          "address: the answer is too short"));
+                                                          "address: the response is too short"));
 }
 
 TEST_F(IpmiConversationTest, ABusyProcessorIsNotOneWithoutALanChannel) {
     ScriptedProcessor busy;
     for (std::uint8_t channel = 0; channel < 16; ++channel) {
-        busy.answers[{0x06, 0x42, channel}] = {0xc0};
+        busy.responses[{0x06, 0x42, channel}] = {0xc0};
     }
     begin(std::move(busy));
     EXPECT_EQ(later(1ms), State::Failed);
@@ -160,7 +160,7 @@ TEST_F(IpmiConversationTest, ABusyProcessorsParametersAreNotUnknown) {
     EXPECT_THAT(conversation_->diagnostics(), ElementsAre("address: completion code 0xc3"));
 }
 
-TEST_F(IpmiConversationTest, AFailureHasOneReasonWhateverElseWasAnswered) {
+TEST_F(IpmiConversationTest, AFailureHasOneReasonWhateverElseCame) {
     ScriptedProcessor busy = ScriptedProcessor::withLan(1, 2, leased);
     busy.refuseParameter(1, 4, 0xc3);
     busy.parameter(1, 3, {198, 51});
@@ -176,11 +176,11 @@ TEST_F(IpmiConversationTest, SilenceIsGivenUpAfterOneSecond) {
     EXPECT_EQ(later(400ms), State::Underway);
     EXPECT_EQ(later(600ms), State::Underway);
     EXPECT_EQ(later(1ms), State::Failed);
-    EXPECT_THAT(conversation_->diagnostics(), ElementsAre("no answer within one second"));
+    EXPECT_THAT(conversation_->diagnostics(), ElementsAre("no response within one second"));
     EXPECT_EQ(later(1ms), State::Failed) << "and stays so";
 }
 
-TEST_F(IpmiConversationTest, OneAnswerOfThreeIsNotEnough) {
+TEST_F(IpmiConversationTest, OneResponseOfThreeIsNotEnough) {
     begin(ScriptedProcessor::withLan(1, 2, leased));
     processor_.ready.erase(processor_.ready.begin() + 1);
     EXPECT_EQ(later(1ms), State::Underway);
@@ -204,13 +204,13 @@ TEST_F(IpmiConversationTest, TheSecondIsForAllRoundsTogether) {
     EXPECT_EQ(later(1ms), State::Failed);
 }
 
-TEST_F(IpmiConversationTest, AnswersThatWaitedLongForTheirReaderWereNotLate) {
+TEST_F(IpmiConversationTest, ResponsesThatWaitedLongForTheirReaderWereNotLate) {
     begin(ScriptedProcessor::withLan(1, 2, leased));
     EXPECT_EQ(later(10min), State::Finished);
     EXPECT_EQ(conversation_->lan(), (LanChannel{1, std::uint8_t{2}, "198.51.100.77"_ip}));
 }
 
-TEST_F(IpmiConversationTest, AnswersComeInAnyOrder) {
+TEST_F(IpmiConversationTest, ResponsesComeInAnyOrder) {
     begin(ScriptedProcessor::withLan(1, 2, leased));
     std::reverse(processor_.ready.begin(), processor_.ready.end());
     EXPECT_EQ(later(1ms), State::Finished);
@@ -221,27 +221,27 @@ TEST_F(IpmiConversationTest, ForeignMessagesDoNotCount) {
     begin(ScriptedProcessor::withLan(1, 2, leased));
     const IpmiResponse lie{0x0d, 0x02, {0, 0x11, 203, 0, 113, 9}};
     const long last = processor_.ready.back().id;
-    processor_.ready.push_front({.id = 0, .answer = lie});
-    processor_.ready.push_front({.id = -1, .answer = lie});
-    processor_.ready.push_front({.id = last + 1, .answer = lie});
+    processor_.ready.push_front({.id = 0, .response = lie});
+    processor_.ready.push_front({.id = -1, .response = lie});
+    processor_.ready.push_front({.id = last + 1, .response = lie});
     EXPECT_EQ(later(1ms), State::Finished);
     EXPECT_EQ(conversation_->lan(), (LanChannel{1, std::uint8_t{2}, "198.51.100.77"_ip}));
 }
 
-TEST_F(IpmiConversationTest, ASecondAnswerToOneQuestionDoesNotCount) {
+TEST_F(IpmiConversationTest, ASecondResponseToOneRequestDoesNotCount) {
     begin(ScriptedProcessor::withLan(1, 2, leased));
     const IpmiReceived source = processor_.ready.at(1);
     IpmiReceived again = source;
-    again.answer.data.back() = 1;
+    again.response.data.back() = 1;
     processor_.ready.insert(processor_.ready.begin() + 2, again);
     EXPECT_EQ(later(1ms), State::Finished);
     EXPECT_EQ(conversation_->lan(), (LanChannel{1, std::uint8_t{2}, "198.51.100.77"_ip}));
 }
 
-TEST_F(IpmiConversationTest, AFloodOfForeignMessagesKeepsNobody) {
+TEST_F(IpmiConversationTest, AFloodOfForeignMessagesKeepsNoCaller) {
     begin(ScriptedProcessor::withLan(1, 2, leased));
     for (int i = 0; i < 1000; ++i) {
-        processor_.ready.push_front({.id = 0, .answer = {}});
+        processor_.ready.push_front({.id = 0, .response = {}});
     }
     EXPECT_EQ(later(1ms), State::Underway);
     EXPECT_LE(processor_.received, 64);

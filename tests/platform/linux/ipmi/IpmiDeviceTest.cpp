@@ -18,7 +18,7 @@
 
 namespace {
 
-/// What the kernel would answer next, and what it was told.
+/// What the kernel would give next, and what it was told.
 struct PlayedKernel {
     struct Pending {
         int type = IPMI_RESPONSE_RECV_TYPE;
@@ -150,7 +150,7 @@ TEST_F(IpmiDeviceTest, RequestsGoToTheProcessorItself) {
     EXPECT_EQ(sent.request, (IpmiRequest{0x0c, 0x02, {1, 3, 0, 0}}));
 }
 
-TEST_F(IpmiDeviceTest, AnswersComeWithTheNumberOfTheirRequest) {
+TEST_F(IpmiDeviceTest, ResponsesComeWithTheNumberOfTheirRequest) {
     root_.write("/dev/ipmi0", "");
     ASSERT_EQ(device_->open(), 0);
     kernel_.pending.push_back({.id = 77, .netFn = 0x0d, .command = 0x02, .data = {0, 0x11, 2}});
@@ -158,11 +158,11 @@ TEST_F(IpmiDeviceTest, AnswersComeWithTheNumberOfTheirRequest) {
     const IpmiReceived received = device_->receive();
     EXPECT_EQ(received.error, 0);
     EXPECT_EQ(received.id, 77);
-    EXPECT_EQ(received.answer, (IpmiResponse{0x0d, 0x02, {0, 0x11, 2}}));
+    EXPECT_EQ(received.response, (IpmiResponse{0x0d, 0x02, {0, 0x11, 2}}));
     EXPECT_EQ(device_->receive().error, EAGAIN);
 }
 
-TEST_F(IpmiDeviceTest, EventsAndCommandsOfOthersAnswerNothing) {
+TEST_F(IpmiDeviceTest, EventsAndCommandsOfOthersAreNotResponses) {
     root_.write("/dev/ipmi0", "");
     ASSERT_EQ(device_->open(), 0);
     for (const int type : {IPMI_ASYNC_EVENT_RECV_TYPE, IPMI_CMD_RECV_TYPE,
@@ -174,7 +174,7 @@ TEST_F(IpmiDeviceTest, EventsAndCommandsOfOthersAnswerNothing) {
     }
 }
 
-TEST_F(IpmiDeviceTest, OfTooLongAnAnswerTheBeginningCounts) {
+TEST_F(IpmiDeviceTest, OfTooLongAResponseTheBeginningCounts) {
     root_.write("/dev/ipmi0", "");
     ASSERT_EQ(device_->open(), 0);
     kernel_.pending.push_back(
@@ -182,11 +182,11 @@ TEST_F(IpmiDeviceTest, OfTooLongAnAnswerTheBeginningCounts) {
     const IpmiReceived received = device_->receive();
     EXPECT_EQ(received.error, 0);
     EXPECT_EQ(received.id, 5);
-    EXPECT_LT(received.answer.data.size(), 5000U);
-    EXPECT_EQ(received.answer.data.at(0), 1);
+    EXPECT_LT(received.response.data.size(), 5000U);
+    EXPECT_EQ(received.response.data.at(0), 1);
 }
 
-TEST_F(IpmiDeviceTest, WhatIsNoSuchDeviceRefusesRequests) {
+TEST_F(IpmiDeviceTest, WhatIsNotSuchADeviceRefusesRequests) {
     root_.write("/dev/ipmi0", "");
     played = nullptr;  // the real kernel, and a file in place of the device
     ASSERT_EQ(device_->open(), 0);

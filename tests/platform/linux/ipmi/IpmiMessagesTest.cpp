@@ -12,15 +12,15 @@ namespace {
 
 using Bytes = std::vector<std::uint8_t>;
 
-IpmiResponse lanAnswer(Bytes data) {
+IpmiResponse lanResponse(Bytes data) {
     return {0x0d, 0x02, std::move(data)};
 }
 
-IpmiResponse channelAnswer(Bytes data) {
+IpmiResponse channelResponse(Bytes data) {
     return {0x07, 0x42, std::move(data)};
 }
 
-/// The answer in a captured table to the parameter of channel 1: the bytes behind
+/// The response in a captured table to the parameter of channel 1: the bytes behind
 /// "=>", with the completion code that the table leaves out when it is 0.
 IpmiResponse captured(int parameter) {
     std::istringstream lines{sample("ipmi/raw-get-lan-config.txt")};
@@ -30,7 +30,7 @@ IpmiResponse captured(int parameter) {
             continue;
         }
         if (const auto refused = line.find("rsp=0x"); refused != std::string::npos) {
-            return lanAnswer(
+            return lanResponse(
                 {static_cast<std::uint8_t>(std::stoul(line.substr(refused + 4), nullptr, 16))});
         }
         Bytes data{0};
@@ -38,7 +38,7 @@ IpmiResponse captured(int parameter) {
         for (std::string byte; rest >> byte;) {
             data.push_back(static_cast<std::uint8_t>(std::stoul(byte, nullptr, 16)));
         }
-        return lanAnswer(data);
+        return lanResponse(data);
     }
     throw std::runtime_error("not captured");
 }
@@ -70,20 +70,20 @@ TEST(IpmiMessages, CapturedRefusal) {
     EXPECT_FALSE(std::get<IpmiRefusal>(address).passing());
 }
 
-TEST(IpmiMessages, AllZeroIsNoAddress) {
-    EXPECT_EQ(decodeLanAddress(lanAnswer({0, 0x11, 0, 0, 0, 0})),
+TEST(IpmiMessages, AllZeroIsNotAnAddress) {
+    EXPECT_EQ(decodeLanAddress(lanResponse({0, 0x11, 0, 0, 0, 0})),
               IpmiDecoded<std::optional<IpAddress>>{std::nullopt});
-    EXPECT_EQ(decodeLanAddress(lanAnswer({0, 0x11, 0, 0, 0, 1})),
+    EXPECT_EQ(decodeLanAddress(lanResponse({0, 0x11, 0, 0, 0, 1})),
               IpmiDecoded<std::optional<IpAddress>>{"0.0.0.1"_ip});
 }
 
 TEST(IpmiMessages, OfTheAddressSourceTheLowHalfCounts) {
-    EXPECT_EQ(decodeLanAddressSource(lanAnswer({0, 0x11, 0xf3})),
+    EXPECT_EQ(decodeLanAddressSource(lanResponse({0, 0x11, 0xf3})),
               IpmiDecoded<std::uint8_t>{std::uint8_t{3}});
 }
 
 TEST(IpmiMessages, ChannelNumberAndMediumWithoutTheirReservedBits) {
-    const auto info = decodeChannelInfo(channelAnswer({0, 0xf1, 0x84, 1, 0x80, 0xf2, 0x1b, 0}));
+    const auto info = decodeChannelInfo(channelResponse({0, 0xf1, 0x84, 1, 0x80, 0xf2, 0x1b, 0}));
     EXPECT_EQ(info, (IpmiDecoded<ChannelInfo>{ChannelInfo{.channel = 1, .medium = 4}}));
     EXPECT_TRUE(std::get<ChannelInfo>(info).isLan());
     EXPECT_FALSE((ChannelInfo{.channel = 0, .medium = 1}).isLan()) << "IPMB";
@@ -91,30 +91,30 @@ TEST(IpmiMessages, ChannelNumberAndMediumWithoutTheirReservedBits) {
 }
 
 TEST(IpmiMessages, MoreBytesThanExpectedDoNotMatter) {
-    EXPECT_EQ(decodeLanAddress(lanAnswer({0, 0x11, 192, 0, 2, 1, 9, 9})),
+    EXPECT_EQ(decodeLanAddress(lanResponse({0, 0x11, 192, 0, 2, 1, 9, 9})),
               IpmiDecoded<std::optional<IpAddress>>{"192.0.2.1"_ip});
 }
 
-TEST(IpmiMessages, ShortAnswersAreToldAsSuch) {
-    EXPECT_EQ(decodeLanAddress(lanAnswer({})),
-              refusal<std::optional<IpAddress>>("the answer is empty"));
+TEST(IpmiMessages, ShortResponsesAreToldAsSuch) {
+    EXPECT_EQ(decodeLanAddress(lanResponse({})),
+              refusal<std::optional<IpAddress>>("the response is empty"));
     for (const Bytes& data : {Bytes{0}, Bytes{0, 0x11}, Bytes{0, 0x11, 192, 0, 2}}) {
-        EXPECT_EQ(decodeLanAddress(lanAnswer(data)),
-                  refusal<std::optional<IpAddress>>("the answer is too short"));
+        EXPECT_EQ(decodeLanAddress(lanResponse(data)),
+                  refusal<std::optional<IpAddress>>("the response is too short"));
     }
-    EXPECT_EQ(decodeLanAddressSource(lanAnswer({0, 0x11})),
-              refusal<std::uint8_t>("the answer is too short"));
-    EXPECT_EQ(decodeChannelInfo(channelAnswer({0, 1})),
-              refusal<ChannelInfo>("the answer is too short"));
+    EXPECT_EQ(decodeLanAddressSource(lanResponse({0, 0x11})),
+              refusal<std::uint8_t>("the response is too short"));
+    EXPECT_EQ(decodeChannelInfo(channelResponse({0, 1})),
+              refusal<ChannelInfo>("the response is too short"));
 }
 
-TEST(IpmiMessages, AnswersToOtherCommandsAreNotBelieved) {
+TEST(IpmiMessages, ResponsesToOtherCommandsAreNotBelieved) {
     const Bytes good{0, 0x11, 192, 0, 2, 1};
-    for (const IpmiResponse& answer :
+    for (const IpmiResponse& response :
          {IpmiResponse{0x0c, 0x02, good}, IpmiResponse{0x0d, 0x01, good},
           IpmiResponse{0x07, 0x42, good}}) {
-        EXPECT_EQ(decodeLanAddress(answer),
-                  refusal<std::optional<IpAddress>>("the answer is one to another command"));
+        EXPECT_EQ(decodeLanAddress(response),
+                  refusal<std::optional<IpAddress>>("the response is to another command"));
     }
 }
 
@@ -141,9 +141,9 @@ TEST(IpmiMessages, AnyBytesGiveFactsOrAReason) {
         if (!data.empty() && i % 2 == 0) {
             data[0] = 0;
         }
-        for (const auto& answer : {lanAnswer(data), channelAnswer(data),
-                                   IpmiResponse{static_cast<std::uint8_t>(byte(random)),
-                                                static_cast<std::uint8_t>(byte(random)), data}}) {
+        for (const auto& response : {lanResponse(data), channelResponse(data),
+                                     IpmiResponse{static_cast<std::uint8_t>(byte(random)),
+                                                  static_cast<std::uint8_t>(byte(random)), data}}) {
             const auto check = [&](const auto& decoded) {
                 if (const auto* const refused = std::get_if<IpmiRefusal>(&decoded)) {
                     EXPECT_FALSE(refused->reason.empty());
@@ -152,9 +152,9 @@ TEST(IpmiMessages, AnyBytesGiveFactsOrAReason) {
                     ++facts;
                 }
             };
-            check(decodeChannelInfo(answer));
-            check(decodeLanAddress(answer));
-            check(decodeLanAddressSource(answer));
+            check(decodeChannelInfo(response));
+            check(decodeLanAddress(response));
+            check(decodeLanAddressSource(response));
         }
     }
     EXPECT_GT(facts, 10'000) << "else the bytes were none that matter";

@@ -22,7 +22,7 @@ class IpmiReaderTest : public testing::Test {
         diagnostics_.clear();
         return reader_.read(diagnostics_);
     }
-    /// What is known once the questions of this moment have been answered.
+    /// What is known once the responses to the requests of this moment have come.
     std::optional<ServiceProcessor> settled() {
         static_cast<void>(reader_.changed());
         return read();
@@ -52,7 +52,7 @@ TEST_F(IpmiReaderTest, TheProcessorIsThereAtOnceAndItsChannelLater) {
     EXPECT_FALSE(processor_.isOpen) << "nothing stays open in between";
 }
 
-TEST_F(IpmiReaderTest, TellsWhetherAnswersAreAwaited) {
+TEST_F(IpmiReaderTest, TellsWhetherResponsesAreAwaited) {
     EXPECT_FALSE(reader_.awaiting()) << "nothing was asked yet";
     EXPECT_EQ(read(), ServiceProcessor{});
     EXPECT_TRUE(reader_.awaiting());
@@ -72,7 +72,7 @@ TEST_F(IpmiReaderTest, IsAskedAtMostOnceAMinute) {
     EXPECT_EQ(processor_.asked.size(), calls);
     EXPECT_EQ(processor_.received, received) << "nor is the transport touched";
     now_ += 1s;
-    EXPECT_FALSE(reader_.changed()) << "asked, and not answered yet";
+    EXPECT_FALSE(reader_.changed()) << "asked, and no response yet";
     EXPECT_EQ(processor_.asked.size(), 2 * calls);
     EXPECT_TRUE(reader_.changed());
     EXPECT_EQ(read()->lan->address, "192.0.2.7"_ip);
@@ -90,7 +90,7 @@ TEST_F(IpmiReaderTest, AMachineWithoutADeviceIsLookedAtOnceAMinuteToo) {
     EXPECT_EQ(settled(), known);
 }
 
-TEST_F(IpmiReaderTest, AnUnchangedAnswerIsNoChange) {
+TEST_F(IpmiReaderTest, AnUnchangedResponseIsNotAChange) {
     EXPECT_EQ(settled(), known);
     for (int i = 0; i < 5; ++i) {
         now_ += 1min;
@@ -100,7 +100,7 @@ TEST_F(IpmiReaderTest, AnUnchangedAnswerIsNoChange) {
     EXPECT_EQ(processor_.opened, 6);
 }
 
-TEST_F(IpmiReaderTest, RareCallsTakeTheOldAnswersAndAskAnew) {
+TEST_F(IpmiReaderTest, RareCallsTakeTheOldResponsesAndAskAnew) {
     EXPECT_EQ(read(), ServiceProcessor{});
     now_ += 1h;
     EXPECT_EQ(read(), known);
@@ -120,7 +120,7 @@ TEST_F(IpmiReaderTest, SilenceLeavesWhatWasKnownUntilTheThirdTime) {
         static_cast<void>(reader_.changed());
         now_ += 2s;
         EXPECT_EQ(read(), known) << failure;
-        EXPECT_THAT(diagnostics_, ElementsAre("service processor: no answer within one second"));
+        EXPECT_THAT(diagnostics_, ElementsAre("service processor: no response within one second"));
     }
     now_ += 1min;
     static_cast<void>(reader_.changed());
@@ -134,7 +134,7 @@ TEST_F(IpmiReaderTest, SilenceLeavesWhatWasKnownUntilTheThirdTime) {
     EXPECT_THAT(diagnostics_, IsEmpty());
 }
 
-TEST_F(IpmiReaderTest, OneAnswerMakesUpForFailures) {
+TEST_F(IpmiReaderTest, OneResponseMakesUpForFailures) {
     EXPECT_EQ(settled(), known);
     for (int i = 0; i < 5; ++i) {
         for (const bool silent : {true, true, false}) {

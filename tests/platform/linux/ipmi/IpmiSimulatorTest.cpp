@@ -1,5 +1,5 @@
-// The questions and answers of the kernel's device, over the network instead, with a
-// simulator that knows how service processors answer.
+// The requests and responses of the kernel's device, over the network instead, with a
+// simulator that knows how service processors respond.
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
@@ -81,7 +81,7 @@ TEST_F(IpmiSimulatorTest, AParameterThatItDoesNotHave) {
     }
     ASSERT_EQ(received.error, 0);
     EXPECT_EQ(received.id, 7);
-    const auto decoded = decodeLanAddress(received.answer);
+    const auto decoded = decodeLanAddress(received.response);
     ASSERT_TRUE(std::holds_alternative<IpmiRefusal>(decoded));
     EXPECT_TRUE(std::get<IpmiRefusal>(decoded).unsupported());
 }

@@ -43,7 +43,7 @@ std::uint8_t checksum(std::span<const std::uint8_t> bytes) {
     return static_cast<std::uint8_t>(-std::accumulate(bytes.begin(), bytes.end(), 0));
 }
 
-/// One message of IPMI over LAN, and the number by which its answer is known.
+/// One message of IPMI over LAN, and the number by which its response is known.
 Bytes messageOf(const IpmiRequest& request, std::uint8_t sequence) {
     Bytes message{processorAddress, static_cast<std::uint8_t>(request.netFn << 2U)};
     message.push_back(checksum(message));
@@ -82,7 +82,7 @@ void RmcpSession::close() noexcept {
 }
 
 bool RmcpSession::logIn() {
-    Bytes wanted(17);  // no authentication, and the name of nobody
+    Bytes wanted(17);  // no authentication, and an empty user name
     wanted.front() = noAuthentication;
     const auto challenge = exchange({appRequest, 0x39, wanted});
     if (!challenge || challenge->data.size() < 21 || challenge->data.front() != 0) {
@@ -104,13 +104,13 @@ bool RmcpSession::logIn() {
 
 std::optional<IpmiResponse> RmcpSession::exchange(const IpmiRequest& request) {
     for (int attempt = 0; attempt < 50; ++attempt) {
-        // Refused while nobody listens there yet.
+        // Refused while the simulator does not listen yet.
         static_cast<void>(send(0, request));
         pollfd descriptor{.fd = socket_.get(), .events = POLLIN, .revents = 0};
         static_cast<void>(::poll(&descriptor, 1, 100));
         const IpmiReceived received = receive();
-        if (received.error == 0 && received.answer.command == request.command) {
-            return received.answer;
+        if (received.error == 0 && received.response.command == request.command) {
+            return received.response;
         }
         if (received.error == ECONNREFUSED) {
             static_cast<void>(::poll(nullptr, 0, 100));
@@ -142,24 +142,24 @@ IpmiReceived RmcpSession::receive() {
     std::array<std::uint8_t, 1024> buffer{};
     const ssize_t got = ::recv(socket_.get(), buffer.data(), buffer.size(), 0);
     if (got < 0) {
-        return {.error = errno, .answer = {}};
+        return {.error = errno, .response = {}};
     }
     const auto packet = std::span{buffer}.first(static_cast<std::size_t>(got));
     const std::size_t start = rmcpHeader.size() + sessionHeaderSize;
     // Two addresses, two checksums, function, number, command and completion code.
     if (packet.size() < start + 8 || packet[rmcpHeader.size()] != noAuthentication ||
         packet[start - 1] != packet.size() - start) {
-        return {.answer = {}};
+        return {.response = {}};
     }
     const auto message = packet.subspan(start);
     if (checksum(message) != 0) {
-        return {.answer = {}};
+        return {.response = {}};
     }
     const auto known = ids_.extract(static_cast<std::uint8_t>(message[4] >> 2U));
     return {.id = known ? known.mapped() : 0,
-            .answer = {static_cast<std::uint8_t>(message[1] >> 2U),
-                       message[5],
-                       {message.begin() + 6, message.end() - 1}}};
+            .response = {static_cast<std::uint8_t>(message[1] >> 2U),
+                         message[5],
+                         {message.begin() + 6, message.end() - 1}}};
 }
 
 }  // namespace ZR::Live

@@ -10,7 +10,7 @@
 
 namespace ZR::Live {
 
-/// The same questions and answers over the network: IPMI 1.5 over RMCP and UDP
+/// The same requests and responses over the network: IPMI 1.5 over RMCP and UDP
 /// (IPMI 2.0, chapter 13), as an administrator without authentication, to a
 /// processor on this machine's loopback. open() waits for it some seconds at most.
 class RmcpSession final : public IpmiTransport {
@@ -23,7 +23,7 @@ class RmcpSession final : public IpmiTransport {
     IpmiReceived receive() override;
 
   private:
-    /// Sends a request of the session's own again and again until it is answered.
+    /// Sends a request of the session's own again and again until there is a response.
     std::optional<IpmiResponse> exchange(const IpmiRequest& request);
     bool logIn();
 

@@ -13,17 +13,17 @@ namespace ZR::Live {
 
 using Bytes = std::vector<std::uint8_t>;
 
-/// A service processor as tests want it: it answers from a table, and what it was
+/// A service processor as tests want it: it responds from a table, and what it was
 /// asked and how it is spoken to stays to be looked at. IpmiSimulatorTest.cpp goes
 /// the same way with a simulator that others made.
 struct ScriptedProcessor {
-    std::map<Bytes, Bytes> answers;  ///< by network function, command and data
-    std::deque<IpmiReceived> ready;  ///< what receive() gives next
+    std::map<Bytes, Bytes> responses;  ///< by network function, command and data
+    std::deque<IpmiReceived> ready;    ///< what receive() gives next
     std::vector<std::pair<long, IpmiRequest>> asked;
     int openError = 0;
     int sendError = 0;
     int receiveError = 0;  ///< instead of there being nothing
-    bool silent = false;   ///< takes requests and answers none
+    bool silent = false;   ///< takes requests and responds to none
     int opened = 0;
     bool isOpen = false;
     int received = 0;
@@ -39,16 +39,16 @@ struct ScriptedProcessor {
     }
 
     void channel(std::uint8_t channel, std::uint8_t medium) {
-        answers[{0x06, 0x42, channel}] = {0x00, channel, medium, 0x01, 0x80,
-                                          0xf2, 0x1b,    0x00,   0x00, 0x00};
+        responses[{0x06, 0x42, channel}] = {0x00, channel, medium, 0x01, 0x80,
+                                            0xf2, 0x1b,    0x00,   0x00, 0x00};
     }
     void parameter(std::uint8_t channel, std::uint8_t number, const Bytes& value) {
-        Bytes& answer = answers[{0x0c, 0x02, channel, number, 0, 0}];
-        answer = {0x00, 0x11};
-        answer.insert(answer.end(), value.begin(), value.end());
+        Bytes& response = responses[{0x0c, 0x02, channel, number, 0, 0}];
+        response = {0x00, 0x11};
+        response.insert(response.end(), value.begin(), value.end());
     }
     void refuseParameter(std::uint8_t channel, std::uint8_t number, std::uint8_t code) {
-        answers[{0x0c, 0x02, channel, number, 0, 0}] = {code};
+        responses[{0x0c, 0x02, channel, number, 0, 0}] = {code};
     }
 };
 
@@ -76,12 +76,13 @@ class ScriptedIpmi final : public IpmiTransport {
         if (!processor_.silent) {
             Bytes key{request.netFn, request.command};
             key.insert(key.end(), request.data.begin(), request.data.end());
-            const auto answer = processor_.answers.find(key);
+            const auto response = processor_.responses.find(key);
             // 0xCC: invalid data field, as for a channel that there is not.
             processor_.ready.push_back(
                 {.id = id,
-                 .answer = {static_cast<std::uint8_t>(request.netFn + 1), request.command,
-                            answer != processor_.answers.end() ? answer->second : Bytes{0xcc}}});
+                 .response = {
+                     static_cast<std::uint8_t>(request.netFn + 1), request.command,
+                     response != processor_.responses.end() ? response->second : Bytes{0xcc}}});
         }
         return 0;
     }
@@ -89,11 +90,11 @@ class ScriptedIpmi final : public IpmiTransport {
     IpmiReceived receive() override {
         ++processor_.received;
         if (!processor_.isOpen) {
-            return {.error = EBADF, .answer = {}};
+            return {.error = EBADF, .response = {}};
         }
         if (processor_.ready.empty()) {
             return {.error = processor_.receiveError != 0 ? processor_.receiveError : EAGAIN,
-                    .answer = {}};
+                    .response = {}};
         }
         IpmiReceived next = std::move(processor_.ready.front());
         processor_.ready.pop_front();

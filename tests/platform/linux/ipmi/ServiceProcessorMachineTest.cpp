@@ -25,15 +25,15 @@ class ServiceProcessorMachineTest : public testing::Test {
   protected:
     /// A machine with one link, eth1, as often as it is read.
     ServiceProcessorMachineTest() {
-        std::deque<std::vector<Step>> answers;
+        std::deque<std::vector<Step>> responses;
         const Message end{NLMSG_DONE, NLM_F_MULTI, std::int32_t{0}};
         for (int i = 0; i < 10; ++i) {
-            answers.push_back({Step{{linkMessage(2, "eth1", 0x11043), end}}});
-            answers.push_back({Step{{addressMessage(2, {192, 0, 2, 1}), end}}});
+            responses.push_back({Step{{linkMessage(2, "eth1", 0x11043), end}}});
+            responses.push_back({Step{{addressMessage(2, {192, 0, 2, 1}), end}}});
         }
         std::filesystem::create_directories(root_.path("/proc/thread-self/ns"));
         surroundings_.roots = {.files = root_.path(), .proc = root_.path("/proc")};
-        surroundings_.transport = std::make_unique<ScriptedTransport>(std::move(answers));
+        surroundings_.transport = std::make_unique<ScriptedTransport>(std::move(responses));
         surroundings_.realProcesses = false;
         surroundings_.uptime = [this] { return uptime_; };
         surroundings_.report = [this](std::string_view text) { diagnostics_.emplace_back(text); };
@@ -90,7 +90,7 @@ TEST_F(ServiceProcessorMachineTest, StandsBesideTheComputerWithItsInterface) {
 TEST_F(ServiceProcessorMachineTest, IsAskedWithoutAReading) {
     LiveMachine& machine = withProcessor();
     EXPECT_TRUE(machine.awaiting());
-    EXPECT_FALSE(machine.awaiting()) << "answered meanwhile";
+    EXPECT_FALSE(machine.awaiting()) << "the response came meanwhile";
     EXPECT_THAT(interfaceNames(*machine.read()), ElementsAre("eth1", "bmc-lan1"));
 }
 
@@ -135,7 +135,7 @@ TEST_F(ServiceProcessorMachineTest, ItsSilenceIsOneLine) {
         uptime_ += 1min;
         EXPECT_FALSE(machine.changed());
     }
-    EXPECT_THAT(diagnostics_, ElementsAre("service processor: no answer within one second"));
+    EXPECT_THAT(diagnostics_, ElementsAre("service processor: no response within one second"));
 }
 
 TEST_F(ServiceProcessorMachineTest, WithoutItsDeviceThereIsTheComputerAlone) {

@@ -34,7 +34,7 @@ TEST(Attributes, WalksOverPaddingAndEmptyPayloads) {
     EXPECT_FALSE(malformed);
 }
 
-TEST(Attributes, FlagBitsAreNoPartOfTheType) {
+TEST(Attributes, FlagBitsAreNotPartOfTheType) {
     bool malformed = true;
     EXPECT_EQ(typesIn(bytesOf({4, 0, 18, 0x80}), malformed), (std::vector<std::uint16_t>{18}));
 }

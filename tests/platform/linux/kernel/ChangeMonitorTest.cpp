@@ -270,12 +270,12 @@ TEST_F(ChangeMonitorTest, AMarkCountsAsAChangeUntilTheNextBeginning) {
     EXPECT_FALSE(monitor_.changed());
 }
 
-TEST_F(ChangeMonitorTest, WhatHappensBetweenBeginningAndQuestionCounts) {
+TEST_F(ChangeMonitorTest, WhatHappensBetweenBeginAndChangedCounts) {
     makeDirectory("/leases");
     watch("/leases");
     begin();
     root_.write("/leases/2", "x");
-    // The state is read now, before or after that: nobody can say.
+    // The state is read now, before or after that: it cannot be known.
     EXPECT_TRUE(monitor_.changed());
 }
 
@@ -355,7 +355,7 @@ constexpr std::uint64_t pollCall = SYS_poll;
 constexpr std::uint64_t pollCall = SYS_ppoll;
 #endif
 
-TEST_F(ChangeMonitorTest, AnIdleQuestionIsOneSystemCall) {
+TEST_F(ChangeMonitorTest, AnIdleCallIsOneSystemCall) {
     makeDirectory("/leases");
     watch("/leases");
     watch("/not/there/yet");

@@ -26,7 +26,7 @@ bool isActiveWith(std::uint32_t flags, std::uint8_t operstate) {
     return isActive(link);
 }
 
-TEST(InterfaceRules, LoopbackIsNoInterface) {
+TEST(InterfaceRules, LoopbackIsNotAnInterface) {
     Link link = linkOf("");
     link.flags = IFF_LOOPBACK;
     EXPECT_FALSE(isNetworkInterface(link, true));

@@ -54,7 +54,7 @@ TEST(Link, KindAndSlaveKindAreNested) {
     EXPECT_EQ(parseLink(message.bytes())->kind, "");
 }
 
-TEST(Link, AlternativeNamesAreNoNames) {
+TEST(Link, AlternativeNamesAreNotNames) {
     Message message = linkMessage(3, "eth0");
     message.text(alternativeNames, "a-much-longer-alternative-name");
     EXPECT_EQ(parseLink(message.bytes())->name, "eth0"_name);

@@ -1,4 +1,4 @@
-// The live machine against a real kernel whose answers are lost, cut, forged or refused
+// The live machine against a real kernel whose responses are lost, cut, forged or refused
 // on their way. What the kernel says is real; what becomes of it is done between the
 // kernel and the C library.
 
@@ -54,8 +54,8 @@ std::vector<std::span<std::byte>> messagesIn(std::span<std::byte> bytes) {
     return messages;
 }
 
-/// Hands each datagram of an answer, with its number from 0, to a function that may
-/// change its bytes and answers how many there are now.
+/// Hands each datagram of a response, with its number from 0, to a function that may
+/// change its bytes and returns how many there are now.
 using Change = std::function<std::size_t(std::span<std::byte> bytes, unsigned number)>;
 
 SystemCalls::Receive changing(Change change) {
@@ -201,7 +201,7 @@ TEST(NetlinkFaults, ADatagramThatWasCutIsAskedForAgain) {
 TEST(NetlinkFaults, DatagramsThatAreCutAgainAndAgainGiveNothing) {
     withKernel([](Kernel& kernel) {
         kernel.expectNothing(*kernel.read(cutting(UINT32_MAX)),
-                             "the answer is longer than the buffer");
+                             "the response is longer than the buffer");
     });
 }
 
@@ -240,7 +240,7 @@ TEST(NetlinkFaults, AnOverrunOfTheSocketIsAskedForAgain) {
         }
         kernel.expectNothing(
             *kernel.read([](SystemCalls& calls) { calls.fail(Call::recvmsg, 1, ENOBUFS, 100); }),
-            "parts of the answer were lost");
+            "parts of the response were lost");
     });
 }
 
@@ -263,20 +263,20 @@ TEST(NetlinkFaults, WaitingForNothingEnds) {
         kernel.expectNothing(*kernel.read([](SystemCalls& calls) {
             calls.fail(Call::recvmsg, 1, EAGAIN, UINT32_MAX - 1);
         }),
-                             "no answer");
-        // Nobody answers, and each wait is interrupted.
+                             "no response");
+        // No response comes, and each wait is interrupted.
         kernel.expectNothing(*kernel.read([](SystemCalls& calls) {
             calls.onSend(
                 [](int, const void*, std::size_t size) { return static_cast<ssize_t>(size); });
             calls.fail(Call::poll, 1, EINTR, UINT32_MAX - 1);
         }),
-                             "no answer");
+                             "no response");
         kernel.expectNothing(*kernel.read([](SystemCalls& calls) {
             calls.onSend(
                 [](int, const void*, std::size_t size) { return static_cast<ssize_t>(size); });
             calls.fail(Call::poll, 1, ENOMEM);
         }),
-                             "no answer");
+                             "no response");
     });
 }
 
@@ -287,7 +287,7 @@ void forge(int victim) {
     auto* const generic = static_cast<sockaddr*>(static_cast<void*>(&address));
     ASSERT_EQ(::getsockname(victim, generic, &size), 0);
     const UniqueFd other{::socket(AF_NETLINK, SOCK_RAW | SOCK_CLOEXEC, NETLINK_ROUTE)};
-    // The first question of a reader has this number.
+    // The first request of a reader has this number.
     for (std::uint32_t sequence = 1; sequence < 8; ++sequence) {
         auto message = linkMessage(77, "forged").bytes();
         auto header = headerOf(message);
@@ -319,7 +319,7 @@ TEST(NetlinkFaults, WhatAnotherProcessSendsIsNotBelieved) {
 }
 
 /// Puts a message with a code in the place of a datagram; it has the number of the
-/// question that the datagram answers.
+/// request that the datagram responds to.
 SystemCalls::Receive saying(std::uint16_t type, std::int32_t code, unsigned times = 1) {
     return changing([=](std::span<std::byte> bytes, unsigned number) {
         if (number >= times) {
@@ -351,7 +351,7 @@ TEST(NetlinkFaults, ADumpThatIsBrokenOffIsNone) {
         kernel.expectNothing(*kernel.read(saying(NLMSG_DONE, -EINTR)), "broken off");
         kernel.expectRight(*kernel.read(saying(NLMSG_OVERRUN, 0)));
         kernel.expectNothing(*kernel.read(saying(NLMSG_OVERRUN, 0, UINT32_MAX)),
-                             "parts of the answer were lost");
+                             "parts of the response were lost");
     });
 }
 
@@ -416,7 +416,7 @@ TEST(NetlinkFaults, AttributesWhoseLengthCannotBeTrueCostTheirMessageOnly) {
     });
 }
 
-TEST(NetlinkFaults, ADatagramThatEndsAnywhereIsNoTrouble) {
+TEST(NetlinkFaults, ADatagramMayEndAnywhere) {
     withKernel([](Kernel& kernel) {
         std::size_t whole = 0;
         kernel.read(changing([&](std::span<std::byte> bytes, unsigned number) {
@@ -484,7 +484,7 @@ TEST(NetlinkFaults, AnInterfaceThatGoesBetweenTheDumpsDoesNotStay) {
     });
 }
 
-TEST(NetlinkFaults, AQuestionThatIsSentInPartIsNone) {
+TEST(NetlinkFaults, ARequestThatIsSentInPartIsNone) {
     withKernel([](Kernel& kernel) {
         for (unsigned call = 1; call <= 2; ++call) {
             SCOPED_TRACE(call);
@@ -498,7 +498,7 @@ TEST(NetlinkFaults, AQuestionThatIsSentInPartIsNone) {
     });
 }
 
-TEST(NetlinkFaults, AQuestionThatCannotBeSentIsNamed) {
+TEST(NetlinkFaults, ARequestThatCannotBeSentIsNamed) {
     withKernel([](Kernel& kernel) {
         for (const int error : {EACCES, EAGAIN, EBADF, ECONNREFUSED, ECONNRESET, EFAULT, EINVAL,
                                 EMSGSIZE, ENOBUFS, ENOMEM, ENOTCONN, EOPNOTSUPP, EPIPE}) {

@@ -1,6 +1,6 @@
-// What a kernel answers only in rare moments cannot be had from a real one at will:
-// here a transport of prepared answers, made of real message bytes, stands in its
-// place. The answers of a real kernel are tested in KernelTest.cpp.
+// What a kernel responses only in rare moments cannot be had from a real one at will:
+// here a transport of prepared responses, made of real message bytes, stands in its
+// place. The responses of a real kernel are tested in KernelTest.cpp.
 
 #include "kernel/RtnetlinkReader.h"
 
@@ -46,9 +46,9 @@ std::vector<Step> someAddresses() {
 
 class RtnetlinkReaderTest : public testing::Test {
   protected:
-    NetworkState read(std::deque<std::vector<Step>> answers,
+    NetworkState read(std::deque<std::vector<Step>> responses,
                       milliseconds time = milliseconds{200}) {
-        auto transport = std::make_unique<ScriptedTransport>(std::move(answers));
+        auto transport = std::make_unique<ScriptedTransport>(std::move(responses));
         transport_ = transport.get();
         reader_ = std::make_unique<RtnetlinkReader>(std::move(transport));
         return reader_->read(steady_clock::now() + time);
@@ -107,7 +107,7 @@ TEST_F(RtnetlinkReaderTest, ADumpThatIsInterruptedAgainAndAgainIsKeptAsUncertain
     EXPECT_THAT(state.diagnostics, ElementsAre(HasSubstr("changed while they were read")));
 }
 
-TEST_F(RtnetlinkReaderTest, AnswersThatWereLostAreAskedForAgainOnANewSocket) {
+TEST_F(RtnetlinkReaderTest, ResponsesThatWereLostAreAskedForAgainOnANewSocket) {
     const NetworkState state = read(
         {{parts({linkMessage(2, "half")}), Step::failing(ENOBUFS)}, someLinks(), someAddresses()});
     EXPECT_THAT(names(state), ElementsAre("lo", "eth0"));
@@ -115,7 +115,7 @@ TEST_F(RtnetlinkReaderTest, AnswersThatWereLostAreAskedForAgainOnANewSocket) {
     EXPECT_EQ(transport_->opened(), 2);
 }
 
-TEST_F(RtnetlinkReaderTest, AnswersThatAreLostAgainAndAgainGiveNoLinks) {
+TEST_F(RtnetlinkReaderTest, ResponsesThatAreLostAgainAndAgainGiveNoLinks) {
     const std::vector<Step> lost{parts({linkMessage(2, "half")}), Step::failing(ENOBUFS)};
     const NetworkState state = read({lost, lost, lost});
     EXPECT_THAT(state.links, IsEmpty());
@@ -155,7 +155,7 @@ TEST_F(RtnetlinkReaderTest, ARefusalIsFinalAndNamesItsReason) {
     EXPECT_EQ(transport_->asked(), 1);
 }
 
-TEST_F(RtnetlinkReaderTest, AnAcknowledgementIsNoRefusal) {
+TEST_F(RtnetlinkReaderTest, AnAcknowledgementIsNotARefusal) {
     const NetworkState state =
         read({{parts({refusal(0), linkMessage(2, "eth0"), done()})}, someAddresses()});
     EXPECT_THAT(names(state), ElementsAre("eth0"));
@@ -190,7 +190,7 @@ TEST_F(RtnetlinkReaderTest, AForeignTruncatedDatagramIsNotListenedToEither) {
     EXPECT_EQ(transport_->asked(), 2);
 }
 
-TEST_F(RtnetlinkReaderTest, AnswersToAnotherQuestionAreSkipped) {
+TEST_F(RtnetlinkReaderTest, ResponsesToAnotherRequestAreSkipped) {
     Message stray = linkMessage(66, "stray");
     const NetworkState state =
         read({{Step::withSequence(999, {stray, done()}), parts({linkMessage(2, "eth0"), done()})},
@@ -198,7 +198,7 @@ TEST_F(RtnetlinkReaderTest, AnswersToAnotherQuestionAreSkipped) {
     EXPECT_THAT(names(state), ElementsAre("eth0"));
 }
 
-TEST_F(RtnetlinkReaderTest, EventsBetweenTheAnswersAreSkipped) {
+TEST_F(RtnetlinkReaderTest, EventsBetweenTheResponsesAreSkipped) {
     ifinfomsg info{};
     info.ifi_index = 2;
     Message event{RTM_DELLINK, NLM_F_MULTI, info};
@@ -240,20 +240,20 @@ TEST_F(RtnetlinkReaderTest, AMessageOfALengthWithTheHighestBitIsLeftOutAndReport
 TEST_F(RtnetlinkReaderTest, SilenceEndsAtTheDeadline) {
     const NetworkState state = read({{}}, milliseconds{60});
     EXPECT_THAT(state.links, IsEmpty());
-    EXPECT_THAT(state.diagnostics, ElementsAre(HasSubstr("no answer: ")));
+    EXPECT_THAT(state.diagnostics, ElementsAre(HasSubstr("no response: ")));
 }
 
 TEST_F(RtnetlinkReaderTest, ADumpThatNeverEndsEndsAtTheDeadline) {
     const NetworkState state = read({{Step::endless({linkMessage(2, "again")})}}, milliseconds{60});
     EXPECT_THAT(state.links, IsEmpty());
-    EXPECT_THAT(state.diagnostics, ElementsAre(HasSubstr("no complete answer in time")));
+    EXPECT_THAT(state.diagnostics, ElementsAre(HasSubstr("no complete response in time")));
 }
 
-// No real kernel can be made to keep a question at will; so this one does.
-TEST_F(RtnetlinkReaderTest, TimeForWhichTheKernelKeepsTheQuestionIsNotTheAnswers) {
+// No real kernel can be made to keep a request at will; so this one does.
+TEST_F(RtnetlinkReaderTest, TimeForWhichTheKernelKeepsTheRequestIsNotTheResponses) {
     auto transport = std::make_unique<ScriptedTransport>(std::deque<std::vector<Step>>{
         {parts({linkMessage(1, "lo")}), parts({linkMessage(2, "eth0"), done()})}, someAddresses()});
-    transport->holdQuestions(milliseconds{30});
+    transport->holdRequests(milliseconds{30});
     RtnetlinkReader reader{std::move(transport)};
     const NetworkState state = reader.read(steady_clock::now() + milliseconds{20});
     EXPECT_THAT(names(state), ElementsAre("lo", "eth0"));
@@ -266,7 +266,7 @@ TEST_F(RtnetlinkReaderTest, AfterTheDeadlineNothingIsAskedForAgain) {
     const Message interrupted = linkMessage(2, "busy", 0, NLM_F_MULTI | NLM_F_DUMP_INTR);
     auto transport = std::make_unique<ScriptedTransport>(std::deque<std::vector<Step>>{
         {parts({interrupted, done()})}, someAddresses(), someLinks()});
-    transport->holdQuestions(milliseconds{30});
+    transport->holdRequests(milliseconds{30});
     const ScriptedTransport& held = *transport;
     RtnetlinkReader reader{std::move(transport)};
     const NetworkState state = reader.read(steady_clock::now() + milliseconds{20});

@@ -5,7 +5,7 @@
 #include <string>
 #include <vector>
 
-#include "clients/Client.h"
+#include "facts/Client.h"
 #include "formats/InterfaceName.h"
 #include "formats/IpAddress.h"
 

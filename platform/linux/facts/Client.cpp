@@ -1,4 +1,4 @@
-#include "clients/Client.h"
+#include "facts/Client.h"
 
 namespace ZR::Live {
 

@@ -1,4 +1,4 @@
-#include "clients/RunningPrograms.h"
+#include "facts/RunningPrograms.h"
 
 #include <algorithm>
 

@@ -1,4 +1,4 @@
-#include "clients/ClientFacts.h"
+#include "facts/ClientFacts.h"
 
 #include <gtest/gtest.h>
 

@@ -4,7 +4,7 @@
 #include <string>
 #include <vector>
 
-#include "clients/Client.h"
+#include "facts/Client.h"
 #include "formats/InterfaceName.h"
 
 namespace ZR::Live {

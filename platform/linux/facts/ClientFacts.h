@@ -4,10 +4,10 @@
 #include <string>
 #include <vector>
 
-#include "clients/BootResponse.h"
-#include "clients/Lease.h"
-#include "clients/LinkConfiguration.h"
-#include "clients/RunningPrograms.h"
+#include "facts/BootResponse.h"
+#include "facts/Lease.h"
+#include "facts/LinkConfiguration.h"
+#include "facts/RunningPrograms.h"
 #include "kernel/Sockets.h"
 #include "kernel/WatchedPlace.h"
 
