@@ -2,7 +2,7 @@
 
 #include <vector>
 
-#include "arguments/CommandLine.h"
+#include "arguments/Commands.h"
 #include "client/Installation.h"
 
 namespace cimdhcp {

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "arguments/CommandLine.h"
+#include "arguments/Commands.h"
 
 namespace cimdhcp {
 

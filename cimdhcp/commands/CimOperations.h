@@ -1,6 +1,6 @@
 #pragma once
 
-#include "arguments/CommandLine.h"
+#include "arguments/Commands.h"
 #include "cimom/Cim.h"
 #include "client/Client.h"
 #include "client/Response.h"

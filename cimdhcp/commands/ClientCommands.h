@@ -3,7 +3,7 @@
 #include <optional>
 #include <string>
 
-#include "arguments/CommandLine.h"
+#include "arguments/Commands.h"
 #include "client/Client.h"
 #include "text/Failure.h"
 #include "text/Presentation.h"

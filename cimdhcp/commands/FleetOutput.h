@@ -5,9 +5,9 @@
 #include <utility>
 #include <vector>
 
-#include "arguments/CommandLine.h"
+#include "arguments/Commands.h"
 #include "commands/Fleet.h"
-#include "commands/Program.h"
+#include "commands/Outputs.h"
 #include "text/Presentation.h"
 #include "text/ProgressBar.h"
 

@@ -2,7 +2,7 @@
 
 #include <iosfwd>
 
-#include "arguments/CommandLine.h"
+#include "arguments/Commands.h"
 
 namespace cimdhcp {
 

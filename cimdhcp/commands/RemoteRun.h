@@ -1,7 +1,7 @@
 #pragma once
 
-#include "arguments/CommandLine.h"
-#include "commands/Program.h"
+#include "arguments/Commands.h"
+#include "commands/Outputs.h"
 #include "text/Failure.h"
 #include "text/Presentation.h"
 

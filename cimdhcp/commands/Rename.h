@@ -2,7 +2,7 @@
 
 #include <string>
 
-#include "arguments/CommandLine.h"
+#include "arguments/Commands.h"
 #include "client/Client.h"
 
 namespace cimdhcp {

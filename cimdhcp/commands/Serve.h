@@ -5,7 +5,7 @@
 #include <ostream>
 #include <string>
 
-#include "arguments/CommandLine.h"
+#include "arguments/Commands.h"
 #include "client/EmbeddedClient.h"
 
 namespace cimdhcp {

@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include "arguments/CommandLine.h"
 #include "text/Failure.h"
 
 namespace cimdhcp {

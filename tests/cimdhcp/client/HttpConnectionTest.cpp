@@ -31,7 +31,7 @@ std::string reasonOf(const std::string& response) {
     return reason(server.url());
 }
 
-TEST(HttpConnection, PostsAndTakesTheAnswer) {
+TEST(HttpConnection, PostsAndTakesTheResponse) {
     const test::RawServer server({test::httpResponse("<x/>", "200 OK", "X-Thing:  a: b \r\n")});
     HttpConnection connection(readServerUrl(server.url()), {}, Deadline(patience));
     const HttpResponse response = connection.post({"CIMMethod: GetClass"}, "the body");

@@ -1,4 +1,4 @@
-// What servers of any kind may answer; program/RemoteTest.cpp asks the real one.
+// What servers of any kind may send; program/RemoteTest.cpp asks the real one.
 #include "client/RemoteClient.h"
 
 #include <gmock/gmock.h>
@@ -91,7 +91,7 @@ TEST_F(RemoteServer, FailuresOfHttpAreTold) {
     EXPECT_EQ(failure(httpResponse("", "204 No Content")), "HTTP 204 in place of a response");
 }
 
-TEST_F(RemoteServer, AnswersThatAreNoneAreTold) {
+TEST_F(RemoteServer, RefusesWhatIsNotAResponse) {
     EXPECT_EQ(failure(httpResponse("")), "the response is not XML: line 1: no element found");
     EXPECT_EQ(failure(httpResponse("<CIM><MESSAGE>")),
               "the response is not XML: line 1: no element found");

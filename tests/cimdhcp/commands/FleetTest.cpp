@@ -99,7 +99,7 @@ TEST(Fleet, NoMoreServersAreAskedAtOnceThanWanted) {
     EXPECT_LE(most, 5);
 }
 
-TEST(Fleet, NobodyIsAskedOnceItIsInterrupted) {
+TEST(Fleet, NoServerIsAskedOnceItIsInterrupted) {
     std::atomic<bool> interrupted = false;
     std::size_t reports = 0;
     askFleet(

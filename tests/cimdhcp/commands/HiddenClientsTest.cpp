@@ -7,7 +7,7 @@
 
 namespace cimdhcp {
 
-TEST(HiddenClients, NothingIsHiddenWhereNobodyRuns) {
+TEST(HiddenClients, NothingIsHiddenWhereNoClientRuns) {
     const ZR::Testing::TemporaryDirectory proc;
     std::filesystem::create_directories(proc / "1");
     ZR::Testing::writeFile(proc / "1/comm", "init\n");

@@ -109,7 +109,7 @@ TEST_F(Check, TellsOfAFaultInSchemaOrRegistration) {
                 HasSubstr("BAD   installation: " + schema + ": no *.registration file is in it"));
 }
 
-TEST_F(Check, TellsOfANamespaceThatNobodyServes) {
+TEST_F(Check, TellsOfANamespaceThatNoProviderServes) {
     const Ended ended = check({"--namespace", "root/other"});
     EXPECT_EQ(ended.status, 1);
     EXPECT_THAT(ended.out, HasSubstr("BAD   registration: no class is served in root/other"));

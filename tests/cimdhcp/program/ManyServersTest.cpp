@@ -53,7 +53,7 @@ class ManyServers : public test::ProgramTest {
     std::vector<std::unique_ptr<test::ServedProgram>> servers_;
 };
 
-TEST_F(ManyServers, SlowAndDeadOnesKeepNobodyWaiting) {
+TEST_F(ManyServers, SlowAndDeadOnesDelayNoOther) {
     constexpr std::size_t alive = 45;
     serve(alive);
     std::vector<std::string> urls;
@@ -97,7 +97,7 @@ TEST_F(ManyServers, SlowAndDeadOnesKeepNobodyWaiting) {
         EXPECT_EQ(response.at("result").at("interfaces").at(0).at("interface"),
                   "eth" + std::to_string(number));
     }
-    // The silent ones came last: nobody waited for them.
+    // The silent ones came last: no other server waited for them.
     EXPECT_THAT((std::vector<std::string>{order.end() - 2, order.end()}),
                 testing::UnorderedElementsAre(bad[3], bad[4]));
     const std::string refused = ": cannot be reached: Connection refused\n";
@@ -175,7 +175,7 @@ TEST_F(ManyServers, GarbageIsAFailureOfItsServer) {
     EXPECT_THAT(ended.err, HasSubstr("  " + cut.url() + ": the response is cut off"));
 }
 
-TEST_F(ManyServers, AListThatCannotBeReadIsNobodysFailure) {
+TEST_F(ManyServers, AListThatCannotBeReadIsNotTheFailureOfAServer) {
     EXPECT_EQ(runAs(program(), {"--hosts", hostsFile({"a", "ftp://b"}), "show"}),
               (Ended{2, "",
                      "cimdhcp: " + (directory() / "hosts") +
@@ -188,7 +188,7 @@ TEST_F(ManyServers, AListThatCannotBeReadIsNobodysFailure) {
 TEST_F(ManyServers, AnInterruptionEndsItWithASum) {
     serve(1);
     const test::RawServer silent({});
-    // While the first answer is on its way to the shell and the signal on its way back,
+    // While the first result is on its way to the shell and the signal on its way back,
     // its thread may have begun with the next server or not, and the other one with its
     // first.
     std::vector<std::string> urls{servers_[0]->url()};
@@ -196,7 +196,7 @@ TEST_F(ManyServers, AnInterruptionEndsItWithASum) {
         urls.push_back(silent.url() + "/" + std::to_string(number));
     }
     const std::string hosts = hostsFile(urls);
-    // The shell sends the signal as soon as the first answer is there.
+    // The shell sends the signal as soon as the first result is there.
     const Ended ended = runAs(
         "/bin/bash", {"-c", "coproc " + program() + " --hosts " + hosts +
                                 " --parallel 2 --timeout 100 show --count\n"

@@ -27,7 +27,7 @@ ZR::UniqueFd openOrThrow(const std::string& path, int flags) {
     return fd;
 }
 
-/// The test's environment without what would change the program's answers, and with
+/// The test's environment without what would change what the program prints, and with
 /// the variables of one run, which replace those of the same name.
 std::vector<std::string> environmentOf(const Environment& extra) {
     std::vector<std::string> result;
@@ -93,7 +93,7 @@ std::string readAll(int fd) {
     std::string text;
     std::array<char, 4096> piece{};
     ssize_t got = 0;
-    // A terminal whose other side is closed answers EIO.
+    // A terminal whose other side is closed gives EIO.
     while ((got = ::read(fd, piece.data(), piece.size())) > 0) {
         text.append(piece.data(), static_cast<std::size_t>(got));
     }

@@ -88,7 +88,7 @@ class Remote : public test::ProgramTest {
     const std::string setting = "QVXZR_DHCPSettingData.InstanceID=\"Computer%eth0\"";
 };
 
-TEST_F(Remote, EveryClassAnswersAsOnTheMachineItself) {
+TEST_F(Remote, EveryClassIsAsOnTheMachineItself) {
     writeConfiguration("eth0", "CONFIG_NAME=\xC3\xA4 <office> & \"more\"\n");
     serve();
     for (const std::string& name : servedClasses()) {
@@ -103,7 +103,7 @@ TEST_F(Remote, EveryClassAnswersAsOnTheMachineItself) {
     expectSame({"names", "CIM_Dependency", "--count"});
 }
 
-TEST_F(Remote, EveryInstanceAnswersAsOnTheMachineItself) {
+TEST_F(Remote, EveryInstanceIsAsOnTheMachineItself) {
     writeConfiguration("eth0", "CONFIG_NAME=office\n");
     serve();
     std::size_t paths = 0;

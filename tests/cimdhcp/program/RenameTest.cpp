@@ -131,7 +131,7 @@ TEST_F(Rename, RefusesNamesThatWouldNotComeBack) {
 }
 
 TEST_F(Rename, FindsOutThatItDidNotTakeEffect) {
-    // The provider answers OK all the same.
+    // The provider returns OK all the same.
     fs::create_directory(configuration("eth0"));
     EXPECT_EQ(run({"rename", "eth0", "office"}),
               (Ended{1, "",

@@ -163,7 +163,7 @@ TEST_F(ServeMemory, NothingOfAProviderKeepsTheServerFromEnding) {
     const Ended late = shell(enumeration("EnumerateInstances", "Many_Waiting") +
                              "-o /dev/null -w '%{http_code}' $url/cimom");
     EXPECT_EQ(late.out, "503");
-    // Without end, though nobody waits for it any more.
+    // Without end, though no client waits for it any more.
     EXPECT_EQ(shell(enumeration("EnumerateInstances", "Many_Endless") +
                     "-o /dev/null -w '%{http_code}' $url/cimom")
                   .out,

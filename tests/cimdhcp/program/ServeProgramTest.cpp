@@ -114,7 +114,7 @@ TEST_F(Serve, AnInstanceIsModifiedAndTheLogTellsIt) {
                                  " ConfigurationName: null -> \"office\" status=OK"));
 }
 
-TEST_F(Serve, ReadOnlyNobodyModifies) {
+TEST_F(Serve, ReadOnlyNoClientModifies) {
     writeConfiguration("eth0", "CONFIG_NAME=home\n");
     serve({"--read-only"});
     const Ended ended = wbemcli("mi", setting, {}, {"ConfigurationName=office"});
@@ -207,7 +207,7 @@ TEST_F(Serve, TlsIsWhatItShouldBe) {
     EXPECT_EQ(curl({"--cacert", certificateFile}).out, "405");
     EXPECT_EQ(curl({"--cacert", certificateFile, "--tlsv1.3"}).out, "405");
     EXPECT_NE(curl({"--cacert", certificateFile, "--tls-max", "1.1"}).status, 0);
-    EXPECT_NE(curl({}).status, 0);  // nobody vouches for the certificate
+    EXPECT_NE(curl({}).status, 0);  // no authority vouches for the certificate
     const Ended plain = runAs("/usr/bin/curl", {"-s", "http://" + server_->host() + "/cimom"});
     EXPECT_NE(plain.status, 0);
 }

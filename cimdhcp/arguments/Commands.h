@@ -1,0 +1,142 @@
+#pragma once
+
+#include <chrono>
+#include <cstddef>
+#include <optional>
+#include <string>
+#include <variant>
+#include <vector>
+
+#include "text/Presentation.h"
+#include "wbem/Limits.h"
+
+namespace cimdhcp {
+
+/// What holds for every command.
+struct Options {
+    std::optional<std::string> tree;     ///< a JSON tree in place of the live machine
+    std::optional<std::string> dataDir;  ///< where the ifcfg- files are
+    std::string nameSpace = "root/cimv2";
+    Format format = Format::table;
+    std::optional<std::string> schemaDir;
+    std::optional<std::string> registrationDir;
+    std::optional<std::string> providerDir;
+
+    // The servers that are asked in place of the object manager of this process.
+    std::vector<std::string> connect;  ///< URLs or hosts
+    std::optional<std::string> hosts;  ///< a file of them; "-": standard input
+    std::size_t parallel = 16;         ///< how many servers are asked at the same time
+    std::chrono::seconds timeout{30};  ///< for all that is asked of one server
+    std::optional<std::string> caCertificate;
+    bool insecure = false;
+    std::optional<std::string> credentials;
+
+    // How the result is shown.
+    bool noHeader = false;
+    std::optional<std::string> sort;
+    bool count = false;
+    bool time = false;
+    ColorMode color = ColorMode::automatic;
+
+    [[nodiscard]] bool remote() const noexcept { return !connect.empty() || hosts; }
+
+    bool operator==(const Options&) const = default;
+};
+
+struct ShowCommand {
+    bool operator==(const ShowCommand&) const = default;
+};
+struct RenameCommand {
+    std::string interfaceName;
+    std::string name;
+    bool create = false;
+
+    bool operator==(const RenameCommand&) const = default;
+};
+struct GraphCommand {
+    bool svg = false;  ///< draw it
+
+    bool operator==(const GraphCommand&) const = default;
+};
+struct TreeCommand {
+    bool explain = false;
+
+    bool operator==(const TreeCommand&) const = default;
+};
+struct ClassesCommand {
+    bool operator==(const ClassesCommand&) const = default;
+};
+struct NamesCommand {
+    std::string className;
+
+    bool operator==(const NamesCommand&) const = default;
+};
+struct InstancesCommand {
+    std::string className;
+
+    bool operator==(const InstancesCommand&) const = default;
+};
+struct GetCommand {
+    std::string path;
+
+    bool operator==(const GetCommand&) const = default;
+};
+struct ModifyCommand {
+    std::string path;
+    std::vector<std::string> assignments;  ///< PROPERTY=VALUE
+
+    bool operator==(const ModifyCommand&) const = default;
+};
+struct AssociatorsCommand {
+    std::string path;
+    bool names = false;
+    std::optional<std::string> assocClass;
+    std::optional<std::string> resultClass;
+    std::optional<std::string> role;
+    std::optional<std::string> resultRole;
+
+    bool operator==(const AssociatorsCommand&) const = default;
+};
+struct ReferencesCommand {
+    std::string path;
+    bool names = false;
+    std::optional<std::string> resultClass;
+    std::optional<std::string> role;
+
+    bool operator==(const ReferencesCommand&) const = default;
+};
+
+struct ServeCommand {
+    std::string listen = "127.0.0.1";  ///< ADDRESS, ADDRESS:PORT or [ADDRESS]:PORT
+    std::optional<std::string> tlsCertificate;
+    std::optional<std::string> tlsKey;
+    std::optional<std::string> users;
+    bool readOnly = false;
+    cimom::wbem::Limits limits;
+
+    bool operator==(const ServeCommand&) const = default;
+};
+struct UserAddCommand {
+    std::string name;
+    std::string users;  ///< the users file
+    bool mayModify = false;
+
+    bool operator==(const UserAddCommand&) const = default;
+};
+struct CheckCommand {
+    bool operator==(const CheckCommand&) const = default;
+};
+
+using Command =
+    std::variant<ShowCommand, RenameCommand, GraphCommand, TreeCommand, ClassesCommand,
+                 NamesCommand, InstancesCommand, GetCommand, ModifyCommand, AssociatorsCommand,
+                 ReferencesCommand, ServeCommand, UserAddCommand, CheckCommand>;
+
+struct CommandLine {
+    Options options;
+    Command command;
+
+    bool operator==(const CommandLine&) const = default;
+};
+
+}  // namespace cimdhcp
