@@ -23,7 +23,7 @@ in_tree() { # a path of the tree, with wildcards; words such as TARGET stand for
     compgen -G "$path" >/dev/null || compgen -G "$path.in" >/dev/null
 }
 
-pages=(README.md SECURITY.md CHANGELOG.md docs/*.md)
+pages=(README.md CONTRIBUTING.md SECURITY.md CHANGELOG.md docs/*.md)
 for page in "${pages[@]}"; do
     while read -r link; do
         [[ $link == *://* || $link == '#'* ]] && continue
