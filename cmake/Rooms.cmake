@@ -25,15 +25,36 @@ target_compile_options(zr_options INTERFACE
     # Other compilers than those of the presets know other warnings.
     $<$<BOOL:${ZR_WERROR}>:-Werror>)
 
+if(ZR_SANITIZERS)
+    add_compile_options(-fsanitize=${ZR_SANITIZERS} -fno-sanitize-recover=all
+                        -fno-omit-frame-pointer -O1 -g1)
+    add_link_options(-fsanitize=${ZR_SANITIZERS})
+    # The check of virtual tables looks at memory through a pipe, and reports a fault
+    # when a test has taken all descriptors away.
+    if(ZR_SANITIZERS MATCHES undefined)
+        add_compile_options(-fno-sanitize=vptr)
+    endif()
+    add_compile_definitions(ZR_SANITIZERS="${ZR_SANITIZERS}")
+endif()
+if(ZR_FUZZERS)
+    # The targets learn from which code an input reaches.
+    add_compile_options(-fsanitize=fuzzer-no-link)
+    add_link_options(-fsanitize=fuzzer-no-link)
+endif()
+if(ZR_COVERAGE)
+    add_compile_options(-fprofile-instr-generate -fcoverage-mapping -O0)
+    add_link_options(-fprofile-instr-generate)
+endif()
+
 # The headers of the standard library that most sources include, compiled once: half of a
 # source's compile time would go into them. A source still includes what it uses; the
 # linter, which does without this, would find what is left out.
 add_library(room_headers OBJECT ${CMAKE_CURRENT_LIST_DIR}/room_headers.cpp)
 target_link_libraries(room_headers PRIVATE zr_options)
 target_precompile_headers(room_headers PRIVATE
-    <algorithm> <array> <charconv> <chrono> <cstdint> <functional> <memory> <mutex>
-    <optional> <span> <sstream> <string> <string_view> <system_error> <unordered_map> <variant>
-    <vector>)
+    <algorithm> <array> <atomic> <charconv> <chrono> <cstdint> <filesystem> <functional> <map>
+    <memory> <mutex> <optional> <span> <sstream> <string> <string_view> <system_error>
+    <unordered_map> <unordered_set> <utility> <variant> <vector>)
 
 # zr_precompiled(TARGET) lets a library of the product use these. Headers fit only
 # options like their own: a source that is optimised in another way goes without.
@@ -56,27 +77,6 @@ function(zr_compiled_together target)
         set_source_files_properties(${ARGN} PROPERTIES UNITY_GROUP ${target})
     endif()
 endfunction()
-
-if(ZR_SANITIZERS)
-    add_compile_options(-fsanitize=${ZR_SANITIZERS} -fno-sanitize-recover=all
-                        -fno-omit-frame-pointer -O1 -g1)
-    add_link_options(-fsanitize=${ZR_SANITIZERS})
-    # The check of virtual tables looks at memory through a pipe, and reports a fault
-    # when a test has taken all descriptors away.
-    if(ZR_SANITIZERS MATCHES undefined)
-        add_compile_options(-fno-sanitize=vptr)
-    endif()
-    add_compile_definitions(ZR_SANITIZERS="${ZR_SANITIZERS}")
-endif()
-if(ZR_FUZZERS)
-    # The targets learn from which code an input reaches.
-    add_compile_options(-fsanitize=fuzzer-no-link)
-    add_link_options(-fsanitize=fuzzer-no-link)
-endif()
-if(ZR_COVERAGE)
-    add_compile_options(-fprofile-instr-generate -fcoverage-mapping -O0)
-    add_link_options(-fprofile-instr-generate)
-endif()
 
 # zr_room(NAME SOURCES file... [ROOT directory] [LINKS target...] [PRIVATE_LINKS target...])
 # A static library whose public headers are under include/, and whose own are named from
