@@ -197,7 +197,7 @@ class PathReader {
     std::size_t position_ = 0;
 };
 
-std::string quoted(std::string_view content) {
+std::string inQuotes(std::string_view content) {
     std::string text = "\"";
     for (const char letter : content) {
         if (letter == '"' || letter == '\\') {
@@ -234,17 +234,17 @@ std::optional<std::string> valueText(const Value& value) {
             if constexpr (std::is_same_v<Held, bool>) {
                 return held ? "TRUE" : "FALSE";
             } else if constexpr (std::is_same_v<Held, std::string>) {
-                return quoted(held);
+                return inQuotes(held);
             } else if constexpr (std::is_same_v<Held, char16_t>) {
                 std::string character;
                 appendUtf8(character, held);
-                return quoted(character);
+                return inQuotes(character);
             } else if constexpr (std::is_same_v<Held, double>) {
                 return realText(held);
             } else if constexpr (std::is_integral_v<Held>) {
                 return std::to_string(held);
             } else if constexpr (std::is_same_v<Held, std::shared_ptr<const ObjectPath>>) {
-                return held == nullptr ? std::nullopt : std::optional(quoted(toText(*held)));
+                return held == nullptr ? std::nullopt : std::optional(inQuotes(toText(*held)));
             } else {
                 return std::nullopt;
             }

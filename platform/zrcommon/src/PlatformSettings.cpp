@@ -77,8 +77,8 @@ constexpr std::array<Setting, 6> settingTable{{
     {"TRACE_SINK", "ZR_TRACE_SINK", &applySink<&PlatformSettings::traceSink>},
 }};
 
-std::string quoted(std::string_view text) {
-    return "\"" + std::string(text) + "\"";
+std::string quoted(const std::string& text) {
+    return "\"" + text + "\"";
 }
 
 void readFile(const std::string& file, bool mustExist, PlatformSettings& settings) {
