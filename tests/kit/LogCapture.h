@@ -87,7 +87,7 @@ inline std::vector<LogRecord> parseLog(std::string_view text) {
 }
 
 /// Sends log and trace of this process to files of a test's own. At its end both
-/// roads keep nothing.
+/// channels keep nothing.
 class LogCapture {
   public:
     explicit LogCapture(int logLevel = 0, int traceLevel = 0) {
