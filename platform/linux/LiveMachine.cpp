@@ -4,9 +4,7 @@
 #include <unistd.h>
 
 #include <algorithm>
-#include <cerrno>
 #include <iterator>
-#include <system_error>
 #include <unordered_set>
 #include <utility>
 #include <variant>
@@ -17,13 +15,12 @@
 #include "kernel/Sockets.h"
 #include "tklogger/TKLogger.h"
 #include "zrclient/InstrumentationService.h"
+#include "zrcommon/LogLevel.h"
 #include "zrcommon/SystemName.h"
 #include "zrlinux/LiveSource.h"
 
 namespace ZR::Live {
 namespace {
-
-constexpr int errorLevel = 6000;
 
 // What could not be read is tried again at the next request, and, when that was of no
 // use, after so long: what is in the way may end without a sign.
@@ -78,7 +75,7 @@ void removeRepeated(std::vector<std::string>& complaints) {
 
 void complainToLog(std::string_view message) {
     TKLog::TKLogger::logLevelMessage("zrclient/LiveMachine", "read", __LINE__, "ZR.Instrumentation",
-                                     errorLevel, nullptr, 0, 0, message);
+                                     LogLevel::failure, nullptr, 0, 0, message);
 }
 
 }  // namespace
@@ -147,21 +144,16 @@ std::shared_ptr<const Snapshot> LiveMachine::tryToRead() {
         sockets_->packetLinks = clients.packetLinks;
     }
     markWireless(surroundings_.roots, network.links);
-    std::string hostName = getSystemName();
-    if (hostName.empty()) {
-        clients.complaints.push_back("the system does not tell its name: " +
-                                     std::generic_category().message(errno));
+    SystemName system = readSystemName();
+    if (system.name.empty()) {
+        clients.complaints.push_back(std::move(system.diagnostic));
     }
     planAnotherTry(clients.complaints);
     // The service processor is asked again at its own pace.
     std::optional<ServiceProcessor> processor = processor_.read(clients.complaints);
     removeRepeated(clients.complaints);
     report(clients.complaints);
-    if (hostName.empty()) {
-        // Whatever is told bears that name.
-        return SnapshotBuilder().build();
-    }
-    return decide({.hostName = std::move(hostName),
+    return decide({.hostName = std::move(system.name),
                    .links = std::move(network.links),
                    .addresses = std::move(network.addresses),
                    .clients = std::move(clients),
