@@ -10,6 +10,7 @@
 #include "NeighbourObjects.h"
 #include "providerutilities/ProviderUtilities.h"
 #include "tklogger/TKLogger.h"
+#include "zrcommon/LogLevel.h"
 #include "zrlinux/LiveSource.h"
 
 /// The CMPI side of the neighbour provider: enumerate, enumerate names and get.
@@ -90,8 +91,9 @@ bool agrees(const NeighbourObject& object, const CMPIObjectPath* path) {
     return true;
 }
 
-/// Hands the objects of the path's class to `give`, which answers false to end the
-/// walk. Nothing that is thrown on the way reaches the object manager.
+/// Hands the objects of the path's class, and its namespace, to `give`, and ends the
+/// result unless that returns an error. Nothing that is thrown on the way reaches the
+/// object manager.
 template <typename Give>
 CMPIStatus serve(const CMPIResult* result, const CMPIObjectPath* path, const Give& give) {
     try {
@@ -108,9 +110,8 @@ CMPIStatus serve(const CMPIResult* result, const CMPIObjectPath* path, const Giv
         }
         return statusOf(code);
     } catch (const std::exception& exception) {
-        constexpr int failure = 6000;
         TKLog::TKLogger::logLevelMessage("neighbours/DHCPClientNeighbours", __func__, __LINE__,
-                                         loggerNeighbours, failure, nullptr, 0, 0,
+                                         loggerNeighbours, LogLevel::failure, nullptr, 0, 0,
                                          exception.what());
         return statusOf(CMPI_RC_ERR_FAILED);
     }

@@ -12,13 +12,10 @@ using NodeLexicon::Properties;
 
 namespace {
 
-// The DHCP client provider names the same objects; its keys must agree with these.
-constexpr const char* serviceProcessorDescription = "BMC";
-constexpr const char* serviceProcessorName = "BMC:-1";
-
 bool isServiceProcessor(const Instrumentation& system) {
     std::string description;
-    return system.getNodeDescription(description) && description == serviceProcessorDescription;
+    return system.getNodeDescription(description) &&
+           description == NodeLexicon::serviceProcessorDescription;
 }
 
 /// The computer two levels above an interface.
@@ -54,7 +51,8 @@ std::vector<InterfaceFacts> readInterfaces() {
             continue;
         }
         interface.ofServiceProcessor = isServiceProcessor(systemOf(cursor));
-        interface.systemName = interface.ofServiceProcessor ? serviceProcessorName : hostName;
+        interface.systemName =
+            interface.ofServiceProcessor ? NodeLexicon::serviceProcessorName : hostName;
         // What cannot be read stays empty or unknown.
         cursor.getProperty(Properties::IPv4Address, interface.ipv4Address);
         cursor.getProperty(Properties::AddressSource, interface.addressSource);

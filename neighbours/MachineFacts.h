@@ -16,7 +16,7 @@ struct ComputerFacts {
 
 struct InterfaceFacts {
     std::string name;
-    std::string systemName;  ///< name of the computer that it belongs to
+    std::string systemName;  ///< name of the computer that it belongs to; empty: not told
     bool ofServiceProcessor = false;
     std::string ipv4Address;         ///< empty: none
     unsigned int addressSource = 0;  ///< NodeLexicon::AddressSource

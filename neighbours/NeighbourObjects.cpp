@@ -49,7 +49,9 @@ NeighbourObject endpointObject(const InterfaceFacts& interface) {
 }
 
 NeighbourObject assignmentObject(const InterfaceFacts& interface) {
-    const std::string system = interface.ofServiceProcessor ? "BMC" : "Computer";
+    const std::string system = interface.ofServiceProcessor
+                                   ? NodeLexicon::serviceProcessorDescription
+                                   : NodeLexicon::hostDescription;
     return {ipAssignmentSettingData,
             {{"InstanceID", system + "%" + interface.name + "%dhcp"}},
             {{"ElementName", interface.name}, {"AddressOrigin", originDHCP}}};

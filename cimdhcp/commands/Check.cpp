@@ -68,11 +68,11 @@ class Examination {
         const ZR::PlatformSettings& settings = ZR::PlatformSettings::process();
         const char* const named = std::getenv("ZR_CONFIG");
         const std::string file = named == nullptr ? "/etc/zr/platform.conf" : named;
-        for (const std::string& diagnostic : settings.complaints) {
+        for (const std::string& diagnostic : settings.diagnostics) {
             add(Verdict::bad, "settings", printable(diagnostic),
                 "correct it; docs/settings.md lists the settings");
         }
-        if (settings.complaints.empty()) {
+        if (settings.diagnostics.empty()) {
             std::error_code error;
             const bool there = fs::exists(file, error);
             add(Verdict::good, "settings",

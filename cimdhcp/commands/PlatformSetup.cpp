@@ -61,7 +61,7 @@ void setUpPlatform(const Options& options, std::ostream& err) {
     setVariable("ZR_INSTRUMENTATION_TREE", options.tree);
     setVariable("ZR_DATA_DIR", options.dataDir);
     const ZR::PlatformSettings& settings = ZR::PlatformSettings::process();
-    for (const std::string& diagnostic : settings.complaints) {
+    for (const std::string& diagnostic : settings.diagnostics) {
         err << "cimdhcp: warning: " << printable(diagnostic) << '\n';
     }
     if (!settings.instrumentationTree.empty()) {

@@ -72,7 +72,7 @@ int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
     fuzz::require(settings.logLevel == expectedLevel(lines, variables, "LOG_LEVEL") &&
                       settings.traceLevel == expectedLevel(lines, variables, "TRACE_LEVEL"),
                   "the last level that is one counts, else the default");
-    fuzz::require(settings.complaints.size() <= lines.size() + variables.size(),
+    fuzz::require(settings.diagnostics.size() <= lines.size() + variables.size(),
                   "each line and variable has one diagnostic at most");
     fuzz::require(ZR::PlatformSettings::read(environment) == settings,
                   "reading again gives the same");

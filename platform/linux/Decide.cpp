@@ -76,8 +76,11 @@ std::shared_ptr<const Snapshot> decide(MachineFacts facts, std::int64_t now, Exp
     if (explain == Explain::Yes) {
         builder.origin("kernel: the name of the system");
     }
-    const auto computer = builder.add(Snapshot::none, "ComputerSystem", "Computer");
-    builder.property(Properties::Name, machine.hostName());
+    const auto computer =
+        builder.add(Snapshot::none, "ComputerSystem", NodeLexicon::hostDescription);
+    builder.property(Properties::Name, machine.hostName().empty()
+                                           ? PropertyValue()
+                                           : PropertyValue(machine.hostName()));
     builder.property(Properties::NameMaxLength, hostNameMaxLength);
     const auto network = builder.add(computer, "Network", "Network");
     for (const InterfaceView& view : machine.interfaces()) {

@@ -4,7 +4,6 @@
 #include <unistd.h>
 
 #include <algorithm>
-#include <cerrno>
 #include <iterator>
 #include <unordered_set>
 #include <utility>
@@ -17,13 +16,12 @@
 #include "ipmi/IpmiDevice.h"
 #include "tklogger/TKLogger.h"
 #include "zrclient/InstrumentationService.h"
+#include "zrcommon/LogLevel.h"
 #include "zrcommon/SystemName.h"
 #include "zrlinux/LiveSource.h"
 
 namespace ZR::Live {
 namespace {
-
-constexpr int errorLevel = 6000;
 
 // What could not be read is tried again at the next request. When it fails again for the
 // same reason, the next try comes after this time: nothing tells when the reason is gone.
@@ -79,7 +77,7 @@ void removeRepeated(std::vector<std::string>& diagnostics) {
 
 void reportToLog(std::string_view message) {
     TKLog::TKLogger::logLevelMessage("zrclient/LiveMachine", "read", __LINE__, "ZR.Instrumentation",
-                                     errorLevel, nullptr, 0, 0, message);
+                                     LogLevel::failure, nullptr, 0, 0, message);
 }
 
 }  // namespace
@@ -145,20 +143,16 @@ std::shared_ptr<const Snapshot> LiveMachine::tryToRead() {
         sockets_ = clients.sockets;
     }
     markWireless(surroundings_.roots, network.links);
-    std::string hostName = getSystemName();
-    if (hostName.empty()) {
-        clients.diagnostics.push_back("the system does not tell its name: " + reasonOf(errno));
+    SystemName system = readSystemName();
+    if (system.name.empty()) {
+        clients.diagnostics.push_back(std::move(system.diagnostic));
     }
     planAnotherTry(clients.diagnostics);
     // The service processor is asked again at its own pace.
     std::optional<ServiceProcessor> processor = processor_.read(clients.diagnostics);
     removeRepeated(clients.diagnostics);
     report(clients.diagnostics);
-    if (hostName.empty()) {
-        // Whatever is told bears that name.
-        return SnapshotBuilder().build();
-    }
-    return decide({.hostName = std::move(hostName),
+    return decide({.hostName = std::move(system.name),
                    .links = std::move(network.links),
                    .addresses = std::move(network.addresses),
                    .clients = std::move(clients),

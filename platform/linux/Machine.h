@@ -16,7 +16,7 @@ namespace ZR::Live {
 
 /// Everything that was read of the machine.
 struct MachineFacts {
-    std::string hostName;
+    std::string hostName;  ///< empty when the machine does not tell it
     std::vector<Link> links;
     std::vector<Address> addresses;
     ClientFacts clients;

@@ -3,81 +3,26 @@
 #include <gtest/gtest.h>
 
 #include <atomic>
-#include <cstdlib>
 #include <filesystem>
-#include <fstream>
 #include <memory>
 #include <stdexcept>
 #include <string>
 #include <utility>
-#include <vector>
 
+#include "kit/Files.h"
+#include "kit/TemporaryDirectory.h"
 #include "sources/JsonTree.h"
-#include "tklogger/TKLogger.h"
 #include "zrclient/InstrumentationService.h"
 #include "zrclient/Snapshot.h"
 #include "zrclient/SnapshotSource.h"
 
 namespace ZR::Testing {
 
-/// A directory of one test's own.
-class Directory {
-  public:
-    Directory() {
-        std::string name = (std::filesystem::temp_directory_path() / "zrclient-XXXXXX").string();
-        if (::mkdtemp(name.data()) == nullptr) {
-            throw std::runtime_error("no temporary directory");
-        }
-        path_ = name;
-    }
-    Directory(const Directory&) = delete;
-    Directory& operator=(const Directory&) = delete;
-    ~Directory() {
-        std::error_code ignored;  // a left-over directory is no reason to fail
-        std::filesystem::remove_all(path_, ignored);
-    }
-
-    [[nodiscard]] std::string operator/(const std::string& name) const {
-        return (path_ / name).string();
-    }
-
-  private:
-    std::filesystem::path path_;
-};
-
-inline void writeInPlace(const std::string& path, const std::string& text) {
-    std::ofstream file(path, std::ios::binary | std::ios::trunc);
-    file << text;
-    file.close();
-    ASSERT_TRUE(file) << path;
-}
-
+/// Replaces a file as a careful author does.
 inline void renameOver(const std::string& path, const std::string& text) {
-    writeInPlace(path + ".new", text);
+    writeFile(path + ".new", text);
     std::filesystem::rename(path + ".new", path);
 }
-
-/// Sends the log to a file for the length of a test.
-class LogFile {
-  public:
-    LogFile() { TKLog::TKLogger::configure({6000, "file:" + path_}, {0, "none"}); }
-    LogFile(const LogFile&) = delete;
-    LogFile& operator=(const LogFile&) = delete;
-    ~LogFile() { TKLog::TKLogger::configure({6000, "stderr"}, {0, "none"}); }
-
-    [[nodiscard]] std::vector<std::string> lines() const {
-        std::vector<std::string> lines;
-        std::ifstream file(path_);
-        for (std::string line; std::getline(file, line);) {
-            lines.push_back(line);
-        }
-        return lines;
-    }
-
-  private:
-    Directory directory_;
-    std::string path_ = directory_ / "log";
-};
 
 /// Stands in for a source where a test must hold its strings: which snapshot is
 /// the present one, and when it changes. The real sources have their own tests.
@@ -117,7 +62,7 @@ inline std::shared_ptr<const Snapshot> parsed(const std::string& text) {
 }
 
 /// Lets the process' service, on which cursors stand, show JSON trees.
-class TreeTest : public testing::Test {
+class SnapshotTreeTest : public testing::Test {
   protected:
     void SetUp() override {
         InstrumentationService::process().useSource(std::make_unique<HandSource>(state_));

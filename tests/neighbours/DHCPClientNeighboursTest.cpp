@@ -81,7 +81,7 @@ Texts propertiesOf(const cimom::Instance& instance) {
 
 class NeighboursTest : public test::TreeTest {
   protected:
-    struct Answer {
+    struct Response {
         CMPIrc code = CMPI_RC_OK;
         Texts paths;
         std::vector<cimom::Instance> instances;
@@ -97,7 +97,7 @@ class NeighboursTest : public test::TreeTest {
 
     /// Calls a slot of the table: `call(context, result, path)`.
     template <typename Call>
-    Answer request(Kind kind, const std::string& path, const Call& call) {
+    Response request(Kind kind, const std::string& path, const Call& call) {
         const cimom::broker::RequestScope scope;
         ResultCollector collector(kind);
         cimom::broker::Arena& arena = cimom::broker::RequestScope::current().arena();
@@ -108,27 +108,27 @@ class NeighboursTest : public test::TreeTest {
         const CMPIStatus status = call(context, broker_.standIn(collector.record()), record);
         EXPECT_EQ(status.msg, nullptr);
         cimom::broker::Delivery delivery = collector.take();
-        Answer answer{status.rc, {}, {}, delivery.returnDoneCalls};
+        Response response{status.rc, {}, {}, delivery.returnDoneCalls};
         for (const auto& each : delivery.paths) {
-            answer.paths.push_back(toText(each.value()));
+            response.paths.push_back(toText(each.value()));
         }
         for (const auto& each : delivery.instances) {
-            answer.instances.push_back(each.value());
+            response.instances.push_back(each.value());
         }
-        return answer;
+        return response;
     }
 
-    Answer names(const std::string& path) {
+    Response names(const std::string& path) {
         return request(Kind::paths, path, [this](auto* context, auto* result, auto* record) {
             return table().enumerateInstanceNames(mi_, context, result, record);
         });
     }
-    Answer instances(const std::string& path) {
+    Response instances(const std::string& path) {
         return request(Kind::instances, path, [this](auto* context, auto* result, auto* record) {
             return table().enumerateInstances(mi_, context, result, record, nullptr);
         });
     }
-    Answer get(const std::string& path) {
+    Response get(const std::string& path) {
         return request(Kind::instances, path, [this](auto* context, auto* result, auto* record) {
             return table().getInstance(mi_, context, result, record, nullptr);
         });
@@ -178,12 +178,12 @@ TEST_F(NeighboursTest, NothingCanBeChanged) {
 // Enumerations.
 
 TEST_F(NeighboursTest, NamesAreWholePathsInTheNamespaceOfTheRequest) {
-    Answer answer = names("QVXZR_ComputerSystem");
-    EXPECT_EQ(answer.code, CMPI_RC_OK);
-    EXPECT_THAT(answer.paths,
+    Response response = names("QVXZR_ComputerSystem");
+    EXPECT_EQ(response.code, CMPI_RC_OK);
+    EXPECT_THAT(response.paths,
                 ElementsAre(ofHost("root/cimv2:QVXZR_ComputerSystem.CreationClassName="
                                    R"("QVXZR_ComputerSystem",Name="@")")));
-    EXPECT_EQ(answer.returnDoneCalls, 1U);
+    EXPECT_EQ(response.returnDoneCalls, 1U);
     EXPECT_THAT(names("QVXZR_SPComputerSystem").paths,
                 ElementsAre("root/cimv2:QVXZR_SPComputerSystem.CreationClassName="
                             R"("QVXZR_SPComputerSystem",Name="BMC:-1")"));
@@ -199,13 +199,13 @@ TEST_F(NeighboursTest, NamesAreWholePathsInTheNamespaceOfTheRequest) {
 }
 
 TEST_F(NeighboursTest, InstancesHaveTheirKeysAsPropertiesToo) {
-    const Answer computers = instances("QVXZR_ComputerSystem");
+    const Response computers = instances("QVXZR_ComputerSystem");
     ASSERT_EQ(computers.instances.size(), 1U);
     EXPECT_THAT(propertiesOf(computers.instances[0]),
                 ElementsAre("CreationClassName=QVXZR_ComputerSystem", "Name=" + hostName(),
                             "ElementName=" + hostName(), "NameFormat=Other", "Dedicated={0}"));
     EXPECT_EQ(computers.returnDoneCalls, 1U);
-    const Answer endpoints = instances("QVXZR_IPProtocolEndpoint");
+    const Response endpoints = instances("QVXZR_IPProtocolEndpoint");
     ASSERT_EQ(endpoints.instances.size(), 1U);
     EXPECT_THAT(
         propertiesOf(endpoints.instances[0]),
@@ -213,7 +213,7 @@ TEST_F(NeighboursTest, InstancesHaveTheirKeysAsPropertiesToo) {
                     "CreationClassName=QVXZR_IPProtocolEndpoint", "Name=eth0", "ElementName=eth0",
                     "NameFormat=NICName", "ProtocolIFType=4096", "IPv4Address=192.0.2.10",
                     "AddressOrigin=4"));
-    const Answer assignments = instances("QVXZR_IPAssignmentSettingData");
+    const Response assignments = instances("QVXZR_IPAssignmentSettingData");
     ASSERT_EQ(assignments.instances.size(), 2U);
     EXPECT_THAT(
         propertiesOf(assignments.instances[1]),
@@ -224,7 +224,7 @@ TEST_F(NeighboursTest, NameKeyChoosesTheComputer) {
     EXPECT_THAT(names(R"(QVXZR_ComputerSystem.Name="BMC:-1")").paths,
                 ElementsAre("root/cimv2:QVXZR_SPComputerSystem.CreationClassName="
                             R"("QVXZR_SPComputerSystem",Name="BMC:-1")"));
-    const Answer none = names(R"(QVXZR_ComputerSystem.Name="elsewhere")");
+    const Response none = names(R"(QVXZR_ComputerSystem.Name="elsewhere")");
     EXPECT_EQ(none.code, CMPI_RC_OK);
     EXPECT_THAT(none.paths, IsEmpty());
     EXPECT_EQ(none.returnDoneCalls, 1U);
@@ -232,25 +232,26 @@ TEST_F(NeighboursTest, NameKeyChoosesTheComputer) {
 
 TEST_F(NeighboursTest, ForeignClassIsInvalidWithoutResultsOrAnEnd) {
     for (const char* name : {"CIM_ComputerSystem", "QVXZR_DHCPSettingData", "No_SuchClass"}) {
-        for (const Answer& answer : {names(name), instances(name), get(name)}) {
-            EXPECT_EQ(answer.code, CMPI_RC_ERR_INVALID_CLASS) << name;
-            EXPECT_THAT(answer.paths, IsEmpty());
-            EXPECT_THAT(answer.instances, IsEmpty());
-            EXPECT_EQ(answer.returnDoneCalls, 0U);
+        for (const Response& response : {names(name), instances(name), get(name)}) {
+            EXPECT_EQ(response.code, CMPI_RC_ERR_INVALID_CLASS) << name;
+            EXPECT_THAT(response.paths, IsEmpty());
+            EXPECT_THAT(response.instances, IsEmpty());
+            EXPECT_EQ(response.returnDoneCalls, 0U);
         }
     }
 }
 
 // Get.
 
-TEST_F(NeighboursTest, GetAnswersTheOneInstanceThatAgreesWithEveryKey) {
-    const Answer answer = get(R"(QVXZR_IPAssignmentSettingData.InstanceID="Computer%eth1%dhcp")");
-    EXPECT_EQ(answer.code, CMPI_RC_OK);
-    ASSERT_EQ(answer.instances.size(), 1U);
+TEST_F(NeighboursTest, GetGivesTheOneInstanceThatAgreesWithEveryKey) {
+    const Response response =
+        get(R"(QVXZR_IPAssignmentSettingData.InstanceID="Computer%eth1%dhcp")");
+    EXPECT_EQ(response.code, CMPI_RC_OK);
+    ASSERT_EQ(response.instances.size(), 1U);
     EXPECT_THAT(
-        propertiesOf(answer.instances[0]),
+        propertiesOf(response.instances[0]),
         ElementsAre("InstanceID=Computer%eth1%dhcp", "ElementName=eth1", "AddressOrigin=4"));
-    EXPECT_EQ(answer.returnDoneCalls, 1U);
+    EXPECT_EQ(response.returnDoneCalls, 1U);
 }
 
 TEST_F(NeighboursTest, GetComparesKeyNamesWithoutAndValuesWithCase) {
@@ -258,10 +259,10 @@ TEST_F(NeighboursTest, GetComparesKeyNamesWithoutAndValuesWithCase) {
     EXPECT_EQ(get(R"(QVXZR_IPProtocolEndpoint.Name="ETH0")").code, CMPI_RC_ERR_NOT_FOUND);
 }
 
-TEST_F(NeighboursTest, GetOfAPathWithoutKeysAnswersTheFirst) {
-    const Answer answer = get("QVXZR_IPAssignmentSettingData");
-    ASSERT_EQ(answer.instances.size(), 1U);
-    EXPECT_EQ(textOf(*answer.instances[0].property("InstanceID")), "Computer%eth0%dhcp");
+TEST_F(NeighboursTest, GetOfAPathWithoutKeysGivesTheFirst) {
+    const Response response = get("QVXZR_IPAssignmentSettingData");
+    ASSERT_EQ(response.instances.size(), 1U);
+    EXPECT_EQ(textOf(*response.instances[0].property("InstanceID")), "Computer%eth0%dhcp");
 }
 
 TEST_F(NeighboursTest, MissingObjectIsNotFoundAndLeavesTheResultOpen) {
@@ -271,10 +272,10 @@ TEST_F(NeighboursTest, MissingObjectIsNotFoundAndLeavesTheResultOpen) {
           R"(QVXZR_IPProtocolEndpoint.SystemName="elsewhere",Name="eth0")",
           R"(QVXZR_IPProtocolEndpoint.Name="eth0",NoSuchKey="x")",
           R"(QVXZR_IPAssignmentSettingData.InstanceID="Computer%eth9%dhcp")"}) {
-        const Answer answer = get(path);
-        EXPECT_EQ(answer.code, CMPI_RC_ERR_NOT_FOUND) << path;
-        EXPECT_THAT(answer.instances, IsEmpty()) << path;
-        EXPECT_EQ(answer.returnDoneCalls, 0U) << path;
+        const Response response = get(path);
+        EXPECT_EQ(response.code, CMPI_RC_ERR_NOT_FOUND) << path;
+        EXPECT_THAT(response.instances, IsEmpty()) << path;
+        EXPECT_EQ(response.returnDoneCalls, 0U) << path;
     }
 }
 
@@ -286,19 +287,19 @@ TEST_F(NeighboursTest, ObjectThatTheBrokerRefusesInAnyPartFailsTheRequest) {
         broker_.fail(function, 2, Fault::status);
         const bool oneOnly =
             function != Function::newObjectPath && function != Function::returnObjectPath;
-        const Answer answer =
+        const Response response =
             names(oneOnly ? "QVXZR_ComputerSystem" : "QVXZR_IPAssignmentSettingData");
-        EXPECT_EQ(answer.code, CMPI_RC_ERR_FAILED) << nameOf(function);
-        EXPECT_EQ(answer.paths.size(), oneOnly ? 0U : 1U) << nameOf(function);
-        EXPECT_EQ(answer.returnDoneCalls, 0U) << nameOf(function);
+        EXPECT_EQ(response.code, CMPI_RC_ERR_FAILED) << nameOf(function);
+        EXPECT_EQ(response.paths.size(), oneOnly ? 0U : 1U) << nameOf(function);
+        EXPECT_EQ(response.returnDoneCalls, 0U) << nameOf(function);
     }
     for (const Function function :
          {Function::newObjectPath, Function::newInstance, Function::addKey, Function::setProperty,
           Function::newArray, Function::setElementAt, Function::returnInstance}) {
         broker_.fail(function, 1, Fault::status);
-        const Answer answer = instances("QVXZR_ComputerSystem");
-        EXPECT_EQ(answer.code, CMPI_RC_ERR_FAILED) << nameOf(function);
-        EXPECT_THAT(answer.instances, IsEmpty()) << nameOf(function);
+        const Response response = instances("QVXZR_ComputerSystem");
+        EXPECT_EQ(response.code, CMPI_RC_ERR_FAILED) << nameOf(function);
+        EXPECT_THAT(response.instances, IsEmpty()) << nameOf(function);
         EXPECT_EQ(get("QVXZR_ComputerSystem").code, CMPI_RC_ERR_FAILED) << nameOf(function);
     }
 }
@@ -312,11 +313,11 @@ TEST_F(NeighboursTest, EveryCallMayFailAndNoneIsFatal) {
             }
             for (unsigned call = 1;; ++call) {
                 broker_.fail(function, call, fault);
-                const Answer answer = get(R"(QVXZR_ComputerSystem.Name="BMC:-1")");
+                const Response response = get(R"(QVXZR_ComputerSystem.Name="BMC:-1")");
                 if (broker_.calls(function) < call) {
                     break;
                 }
-                EXPECT_THAT(answer.code,
+                EXPECT_THAT(response.code,
                             ::testing::AnyOf(CMPI_RC_OK, CMPI_RC_ERR_FAILED, CMPI_RC_ERR_NOT_FOUND,
                                              CMPI_RC_ERR_INVALID_CLASS))
                     << nameOf(function) << ' ' << call;

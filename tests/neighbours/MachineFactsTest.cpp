@@ -5,6 +5,7 @@
 #include <string>
 #include <vector>
 
+#include "kit/HostNameFake.h"
 #include "kit/Tree.h"
 
 namespace {
@@ -65,6 +66,14 @@ TEST_F(MachineFactsTest, InterfaceWithoutAReadableNameIsLeftOut) {
     setTree({host(
         {{{"type", "NetworkInterface"}, {"description", "nameless"}}, staticInterface("eth0")})});
     EXPECT_EQ(readInterfaces(), (std::vector<InterfaceFacts>{{"eth0", hostName(), false, "", 3}}));
+}
+
+TEST_F(MachineFactsTest, MachineThatDoesNotTellItsNameIsLeftOutButNotItsInterfaces) {
+    setTree({host({staticInterface("eth0")}), serviceProcessor({dhcpInterface("bmc0")})});
+    const ZR::Testing::HostNameFails failing;
+    EXPECT_EQ(readComputers(), (std::vector<ComputerFacts>{{"BMC:-1", true}}));
+    EXPECT_EQ(readInterfaces(), (std::vector<InterfaceFacts>{{"eth0", "", false, "", 3},
+                                                             {"bmc0", "BMC:-1", true, "", 1}}));
 }
 
 TEST_F(MachineFactsTest, InterfaceWithNothingAboveIsTheHosts) {

@@ -6,9 +6,10 @@
 #include <unistd.h>
 
 #include <cerrno>
-#include <cstring>
 
 #include "LogLine.h"
+#include "zrcommon/Errno.h"
+#include "zrcommon/LogLevel.h"
 
 namespace TKLog {
 
@@ -16,12 +17,10 @@ namespace {
 
 /// Failures are errors to an administrator, flow is not.
 int priorityOf(int level) {
-    constexpr int failure = 6000;
-    constexpr int flow = 4000;
-    if (level >= failure) {
+    if (level >= ZR::LogLevel::failure) {
         return LOG_ERR;
     }
-    return level >= flow ? LOG_INFO : LOG_DEBUG;
+    return level >= ZR::LogLevel::flow ? LOG_INFO : LOG_DEBUG;
 }
 
 void toSyslog(const TKLogger::Line& line) {
@@ -30,8 +29,8 @@ void toSyslog(const TKLogger::Line& line) {
 }
 
 /// One call writes the line whole, but for a pipe in whose way a signal comes: its
-/// rest follows. What does not fit on a full disk is lost, and there is no one left
-/// to tell.
+/// rest follows. What does not fit on a full disk is lost, as there is no other place
+/// to report it.
 void writeWhole(int fd, std::string_view text) {
     while (!text.empty()) {
         const ssize_t written = ::write(fd, text.data(), text.size());
@@ -96,7 +95,8 @@ void LogSink::writeFile(const TKLogger::Line& line) {
     // The line is not lost: syslog takes it, after being told once why.
     if (!failed_) {
         failed_ = true;
-        ::syslog(LOG_DAEMON | LOG_ERR, "log file %s: %s", path_.c_str(), std::strerror(errno));
+        ::syslog(LOG_DAEMON | LOG_ERR, "log file %s: %s", path_.c_str(),
+                 ZR::reasonOf(errno).c_str());
     }
     toSyslog(line);
 }

@@ -9,7 +9,7 @@
 
 namespace TKLog {
 
-/// The end of one road. Safe on any thread.
+/// Where the lines of one channel go. Safe on any thread.
 class LogSink {
   public:
     /// "none", "stderr", "syslog" or "file:PATH"; anything else counts as "none".

@@ -6,6 +6,7 @@
 #include <mutex>
 
 #include "LogSink.h"
+#include "zrcommon/LogLevel.h"
 #include "zrcommon/PlatformSettings.h"
 
 namespace TKLog {
@@ -22,8 +23,8 @@ class Service {
     Service(const Service&) = delete;
     Service& operator=(const Service&) = delete;
 
-    /// At the end of the process, or of the library, other objects may still have
-    /// something to say. It is discarded, since the sinks are gone.
+    /// At the end of the process, or of the library, other objects may still log. Their
+    /// lines are discarded, since the sinks are gone.
     ~Service() {
         TKLogger::logThreshold.store(INT_MAX, std::memory_order_relaxed);
         TKLogger::traceThreshold.store(INT_MAX, std::memory_order_relaxed);
@@ -46,7 +47,7 @@ class Service {
         }
     }
 
-    void configure(const Road& log, const Road& trace) {
+    void configure(const Channel& log, const Channel& trace) {
         std::call_once(setUp_, [] {});
         apply(log, log_, TKLogger::logThreshold);
         apply(trace, trace_, TKLogger::traceThreshold);
@@ -57,11 +58,12 @@ class Service {
 
   private:
     // INT_MAX discards everything, since no line has that level; INT_MIN is what
-    // an unprepared road holds, so no road is ever set to it again.
-    void apply(const Road& road, std::shared_ptr<LogSink>& sink, std::atomic<int>& threshold) {
-        auto target = std::make_shared<LogSink>(road.sink);
-        const int level = target->keepsNothing() ? INT_MAX : std::max(road.level, INT_MIN + 1);
-        // Both under the lock, so that of two who set up a road at once one wins whole.
+    // a channel holds before it is set up, so none is ever set to it again.
+    void apply(const Channel& channel, std::shared_ptr<LogSink>& sink,
+               std::atomic<int>& threshold) {
+        auto target = std::make_shared<LogSink>(channel.sink);
+        const int level = target->keepsNothing() ? INT_MAX : std::max(channel.level, INT_MIN + 1);
+        // Both under the lock, so that of two threads that set up a channel at once one wins whole.
         const std::lock_guard lock(mutex_);
         sink = std::move(target);
         threshold.store(level, std::memory_order_relaxed);
@@ -71,11 +73,11 @@ class Service {
         const ZR::PlatformSettings& settings = ZR::PlatformSettings::process();
         apply({settings.logLevel, settings.logSink}, log_, TKLogger::logThreshold);
         apply({settings.traceLevel, settings.traceSink}, trace_, TKLogger::traceThreshold);
-        for (const std::string& complaint : settings.complaints) {
-            constexpr int failure = 6000;
+        for (const std::string& diagnostic : settings.diagnostics) {
+            constexpr int failure = ZR::LogLevel::failure;
             if (failure >= TKLogger::logThreshold.load(std::memory_order_relaxed)) {
-                log_->write(
-                    {"tklogger/TKLogger", "settings", __LINE__, "ZR.Platform", failure, complaint});
+                log_->write({"tklogger/TKLogger", "settings", __LINE__, "ZR.Platform", failure,
+                             diagnostic});
             }
         }
     }
@@ -101,7 +103,7 @@ void TKLogger::keepTrace(const Line& line) noexcept {
     }
 }
 
-void TKLogger::configure(const Road& log, const Road& trace) noexcept {
+void TKLogger::configure(const Channel& log, const Channel& trace) noexcept {
     try {
         Service::instance().configure(log, trace);
     } catch (const std::exception&) {  // NOLINT(bugprone-empty-catch)

@@ -12,7 +12,7 @@ namespace {
 
 std::atomic<InstrumentationService::OpenMachine> openMachine = nullptr;
 
-/// What a process sees that was never told how its machine is opened.
+/// The source of a process that was not told how its machine is opened.
 class NoMachine : public SnapshotSource {
   public:
     bool changed() override { return false; }
@@ -48,12 +48,17 @@ std::shared_ptr<const Snapshot> InstrumentationService::published() {
     return snapshot_;
 }
 
-/// Reads the source and publishes what it read. Call with the source locked.
-std::shared_ptr<const Snapshot> InstrumentationService::readSource() {
+/// The source, opened now if this is its first use. Call with the source locked.
+SnapshotSource& InstrumentationService::openedSource() {
     if (!source_) {
         source_ = openSourceOfSettings();
     }
-    std::shared_ptr<const Snapshot> newest = source_->read();
+    return *source_;
+}
+
+/// Reads the source and publishes what it read. Call with the source locked.
+std::shared_ptr<const Snapshot> InstrumentationService::readSource() {
+    std::shared_ptr<const Snapshot> newest = openedSource().read();
     ++readings_;
     std::shared_ptr<const Snapshot> replaced = newest;
     {
@@ -79,10 +84,7 @@ std::shared_ptr<const Snapshot> InstrumentationService::current() {
 
 bool InstrumentationService::awaiting() {
     const std::lock_guard lock(sourceMutex_);
-    if (!source_) {
-        source_ = openSourceOfSettings();
-    }
-    return source_->awaiting();
+    return openedSource().awaiting();
 }
 
 void InstrumentationService::settle(std::chrono::milliseconds limit) {

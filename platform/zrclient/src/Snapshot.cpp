@@ -1,38 +1,13 @@
 #include "zrclient/Snapshot.h"
 
 #include <algorithm>
-#include <bit>
 #include <cstddef>
-#include <optional>
-#include <unordered_map>
+#include <map>
 #include <utility>
 
 namespace ZR {
 
 namespace {
-
-thread_local std::uint64_t comparisons = 0;
-
-// 64-bit FNV-1a, which goes on from the hash of a parent's path to that of a
-// child's, so that a path looked up is hashed as it stands.
-constexpr std::uint64_t hashOfNothing = 0xcbf29ce484222325U;
-
-std::uint64_t extend(std::uint64_t hash, std::string_view text) noexcept {
-    constexpr std::uint64_t prime = 0x100000001b3U;
-    for (const char character : text) {
-        hash = (hash ^ static_cast<unsigned char>(character)) * prime;
-    }
-    return hash;
-}
-
-/// The slot at which the search for a hash begins. The upper bits are mixed in,
-/// as the lower ones alone know little of the first characters.
-std::size_t firstSlot(std::uint64_t hash, std::size_t slots) noexcept {
-    hash ^= hash >> 33U;
-    hash *= 0xff51afd7ed558ccdU;
-    hash ^= hash >> 33U;
-    return static_cast<std::size_t>(hash) & (slots - 1);
-}
 
 /// A name as a segment of a path, in which a "/" cannot be taken for a separator.
 std::string escaped(std::string_view name) {
@@ -64,70 +39,28 @@ std::string_view nameOf(const Snapshot::Node& node, std::span<const SnapshotProp
     return node.description;
 }
 
-std::optional<NodeLexicon::NodeType> typeOf(std::string_view name) {
-    for (const auto& entry : NodeLexicon::nodeTypes) {
-        if (entry.name == name) {
-            return entry.number;
-        }
-    }
-    return std::nullopt;
-}
-
-/// Gives the nodes their keys and enters them into the index of paths, in
-/// document order: the first of several siblings with one name keeps it bare.
-class PathIndex {
+/// Gives nodes, in document order, keys that their siblings do not have: the first of
+/// several siblings with one name keeps it bare.
+class Keys {
   public:
-    explicit PathIndex(std::vector<Snapshot::Node>& nodes)
-        // At most half full, so that a search ends after two slots on average.
-        : nodes_(nodes), slots_(std::bit_ceil(2 * nodes.size() + 2), Snapshot::none) {
-        hashes_.reserve(nodes.size());
-    }
-
-    void enter(std::string_view name) {
-        const auto index = static_cast<Snapshot::Index>(hashes_.size());
-        Snapshot::Node& node = nodes_[index];
+    void give(Snapshot::Node& node, std::string_view name) {
         node.key = escaped(name);
-        std::size_t slot = find(node);
-        if (slots_[slot] != Snapshot::none) {
-            // The count goes on from where the last namesake left it, else many
-            // namesakes would take quadratic time.
-            const std::string bare = node.key;
-            std::uint32_t& number = namesakes_.try_emplace(slots_[slot], 1U).first->second;
-            do {
-                node.key = bare + "#" + std::to_string(++number);
-                slot = find(node);
-            } while (slots_[slot] != Snapshot::none);
+        const auto [place, isNew] = numbers_.try_emplace({node.parent, node.key}, 1U);
+        if (isNew) {
+            return;
         }
-        slots_[slot] = index;
-        hashes_.push_back(hashOf(node));
+        // The count goes on from where the last namesake left it, else many
+        // namesakes would take quadratic time.
+        const std::string bare = node.key;
+        do {
+            node.key = bare + "#" + std::to_string(++place->second);
+        } while (!numbers_.try_emplace({node.parent, node.key}, 1U).second);
     }
-
-    [[nodiscard]] std::vector<Snapshot::Index> take() { return std::move(slots_); }
 
   private:
-    [[nodiscard]] std::uint64_t hashOf(const Snapshot::Node& node) const {
-        const std::uint64_t parent =
-            node.parent == Snapshot::none ? hashOfNothing : hashes_[node.parent];
-        return extend(extend(parent, "/"), node.key);
-    }
-
-    /// The slot of the sibling that has this node's key, or the free one for it.
-    [[nodiscard]] std::size_t find(const Snapshot::Node& node) const {
-        std::size_t slot = firstSlot(hashOf(node), slots_.size());
-        while (slots_[slot] != Snapshot::none) {
-            const Snapshot::Node& present = nodes_[slots_[slot]];
-            if (present.parent == node.parent && present.key == node.key) {
-                break;
-            }
-            slot = (slot + 1) & (slots_.size() - 1);
-        }
-        return slot;
-    }
-
-    std::vector<Snapshot::Node>& nodes_;
-    std::vector<Snapshot::Index> slots_;
-    std::vector<std::uint64_t> hashes_;
-    std::unordered_map<Snapshot::Index, std::uint32_t> namesakes_;
+    /// The keys given so far, which the nodes hold, each with the number that its last
+    /// namesake has.
+    std::map<std::pair<Snapshot::Index, std::string_view>, std::uint32_t> numbers_;
 };
 
 }  // namespace
@@ -160,7 +93,7 @@ Snapshot::Index Snapshot::first(NodeLexicon::NodeType type) const noexcept {
         case NodeLexicon::NodeType::ComputerSystem:
             return firstComputerSystem_;
     }
-    return none;  // a number that is none of the lexicon's
+    return none;  // a number that the lexicon does not have
 }
 
 std::string Snapshot::path(Index index) const {
@@ -181,7 +114,6 @@ std::string Snapshot::path(Index index) const {
 bool Snapshot::isPathOf(std::string_view path, Index index) const noexcept {
     for (; index != none; index = nodes_[index].parent) {
         const std::string& key = nodes_[index].key;
-        ++comparisons;
         if (path.size() <= key.size() || !path.ends_with(key) ||
             path[path.size() - key.size() - 1] != '/') {
             return false;
@@ -192,19 +124,13 @@ bool Snapshot::isPathOf(std::string_view path, Index index) const noexcept {
 }
 
 Snapshot::Index Snapshot::resolve(std::string_view path) const noexcept {
-    if (pathIndex_.empty()) {
-        return none;
+    // From the front, as it is parents that are asked for, and these come first.
+    for (Index index = 0; index < nodes_.size(); ++index) {
+        if (isPathOf(path, index)) {
+            return index;
+        }
     }
-    const std::size_t slots = pathIndex_.size();
-    std::size_t slot = firstSlot(extend(hashOfNothing, path), slots);
-    while (pathIndex_[slot] != none && !isPathOf(path, pathIndex_[slot])) {
-        slot = (slot + 1) & (slots - 1);
-    }
-    return pathIndex_[slot];
-}
-
-std::uint64_t Snapshot::keyComparisons() noexcept {
-    return comparisons;
+    return none;
 }
 
 Snapshot::Index SnapshotBuilder::add(Snapshot::Index parent, std::string type,
@@ -250,20 +176,19 @@ std::shared_ptr<const Snapshot> SnapshotBuilder::build() {
     snapshot.nodes_.shrink_to_fit();
     snapshot.properties_.shrink_to_fit();
 
-    PathIndex paths(snapshot.nodes_);
+    Keys keys;
     Snapshot::Index* nextInterface = &snapshot.firstNetworkInterface_;
     Snapshot::Index* nextSystem = &snapshot.firstComputerSystem_;
     for (Snapshot::Index index = 0; index < snapshot.nodes_.size(); ++index) {
         Snapshot::Node& node = snapshot.nodes_[index];
-        paths.enter(nameOf(node, snapshot.properties(index)));
-        const auto type = typeOf(node.type);
+        keys.give(node, nameOf(node, snapshot.properties(index)));
+        const auto type = NodeLexicon::nodeTypeOf(node.type);
         if (type == NodeLexicon::NodeType::NetworkInterface) {
             nextInterface = &(*nextInterface = index, node.nextOfType);
         } else if (type == NodeLexicon::NodeType::ComputerSystem) {
             nextSystem = &(*nextSystem = index, node.nextOfType);
         }
     }
-    snapshot.pathIndex_ = paths.take();
     return std::make_shared<const Snapshot>(std::move(snapshot));
 }
 

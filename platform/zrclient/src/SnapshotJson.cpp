@@ -13,15 +13,6 @@ namespace {
 
 using Json = nlohmann::ordered_json;
 
-std::string_view nameOf(NodeLexicon::Properties id) {
-    for (const auto& entry : NodeLexicon::properties) {
-        if (entry.number == id) {
-            return entry.name;
-        }
-    }
-    return {};
-}
-
 Json valueOf(const PropertyValue& value) {
     return std::visit(
         [](const auto& content) {
@@ -42,7 +33,7 @@ Json alone(const Snapshot& snapshot, Snapshot::Index index) {
     Json readOnly = Json::array();
     Json origins = Json::object();
     for (const SnapshotProperty& property : snapshot.properties(index)) {
-        const std::string name(nameOf(property.id));
+        const std::string name(NodeLexicon::nameOf(property.id));
         if (name.empty()) {
             continue;  // a number outside the lexicon has no name that it could be read back by
         }

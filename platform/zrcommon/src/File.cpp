@@ -12,12 +12,6 @@
 
 namespace ZR {
 
-File::Path::Path(std::wstring_view wide) : bytes_(make_string(wide)) {}
-
-std::wstring File::Path::wide() const {
-    return make_wstring(bytes_);
-}
-
 namespace {
 
 /// The system's functions would take what stands before a zero byte for the name.
@@ -27,6 +21,33 @@ bool isName(const std::string& path) {
     }
     errno = ENOENT;
     return false;
+}
+
+/// What the system tells of an open file's size; nothing, with errno set, when it is
+/// not a regular file or larger than the limit.
+std::optional<std::size_t> sizeOf(const UniqueFd& fd, std::size_t limit) {
+    struct stat status {};
+    if (::fstat(fd.get(), &status) != 0) {
+        return std::nullopt;
+    }
+    if (!S_ISREG(status.st_mode)) {
+        errno = S_ISDIR(status.st_mode) ? EISDIR : EINVAL;
+        return std::nullopt;
+    }
+    const auto size = static_cast<std::size_t>(status.st_size);
+    if (size > limit) {
+        errno = EFBIG;
+        return std::nullopt;
+    }
+    return size;
+}
+
+ssize_t readSome(const UniqueFd& fd, char* room, std::size_t size) {
+    ssize_t got = 0;
+    do {
+        got = ::read(fd.get(), room, size);
+    } while (got < 0 && errno == EINTR);
+    return got;
 }
 
 }  // namespace
@@ -43,29 +64,17 @@ std::optional<std::string> File::read(const std::string& path, std::size_t limit
     }
     // Non-blocking, so that a pipe in the file's place cannot hang the caller.
     const UniqueFd fd{::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY)};
-    struct stat status {};
-    if (!fd || ::fstat(fd.get(), &status) != 0) {
-        return std::nullopt;
-    }
-    if (!S_ISREG(status.st_mode)) {
-        errno = S_ISDIR(status.st_mode) ? EISDIR : EINVAL;
-        return std::nullopt;
-    }
     // A size that is too large is met before any room is taken for it.
-    const auto size = static_cast<std::size_t>(status.st_size);
-    if (size > limit) {
-        errno = EFBIG;
+    const auto size = fd ? sizeOf(fd, limit) : std::nullopt;
+    if (!size) {
         return std::nullopt;
     }
     // One byte more than the size shows that the file ends there; files of /proc
     // and /sys tell no size.
-    std::string content(std::max<std::size_t>(size + 1, 4096), '\0');
+    std::string content(std::max<std::size_t>(*size + 1, 4096), '\0');
     std::size_t filled = 0;
     for (;;) {
-        ssize_t got = 0;
-        do {
-            got = ::read(fd.get(), content.data() + filled, content.size() - filled);
-        } while (got < 0 && errno == EINTR);
+        const ssize_t got = readSome(fd, content.data() + filled, content.size() - filled);
         if (got < 0) {
             return std::nullopt;
         }

@@ -6,9 +6,9 @@
 #include <cerrno>
 #include <charconv>
 #include <cstdlib>
-#include <cstring>
 #include <string_view>
 
+#include "zrcommon/Errno.h"
 #include "zrcommon/File.h"
 #include "zrcommon/PropertyFile.h"
 
@@ -18,8 +18,8 @@ namespace {
 
 constexpr const char* defaultFile = "/etc/zr/platform.conf";
 
-/// Takes a text into a setting; answers what is wrong with it, or null. The
-/// setting has its default when something is: a complaint about a value must not
+/// Takes a text into a setting; returns what is wrong with it, or null. The
+/// setting has its default when something is: a value that cannot be used must not
 /// leave an earlier one in force.
 using Apply = const char* (*)(std::string_view value, PlatformSettings& settings);
 
@@ -85,25 +85,25 @@ void readFile(const std::string& file, bool mustExist, PlatformSettings& setting
     const auto content = File::read(file);
     if (!content) {
         if (mustExist || errno != ENOENT) {
-            settings.complaints.push_back(file + ": " + std::strerror(errno));
+            settings.diagnostics.push_back(file + ": " + reasonOf(errno));
         }
         return;
     }
     for (const PropertyLine& line : parsePropertyLines(*content)) {
         const std::string place = file + ":" + std::to_string(line.line) + ": ";
         if (line.key.empty()) {
-            settings.complaints.push_back(place + "no KEY=value line: " + quoted(line.value));
+            settings.diagnostics.push_back(place + "not a KEY=value line: " + quoted(line.value));
             continue;
         }
-        const char* complaint = "no such setting";
+        const char* fault = "no such setting";
         for (const Setting& setting : settingTable) {
             if (line.key == setting.key) {
-                complaint = setting.apply(line.value, settings);
+                fault = setting.apply(line.value, settings);
             }
         }
-        if (complaint != nullptr) {
-            settings.complaints.push_back(place + line.key + "=" + quoted(line.value) + ": " +
-                                          complaint);
+        if (fault != nullptr) {
+            settings.diagnostics.push_back(place + line.key + "=" + quoted(line.value) + ": " +
+                                           fault);
         }
     }
 }
@@ -130,7 +130,7 @@ PlatformSettings PlatformSettings::read(const Environment& environment) {
     PlatformSettings settings;
     const char* file = environment("ZR_CONFIG");
     if (file != nullptr && *file == '\0') {
-        settings.complaints.emplace_back("ZR_CONFIG=\"\": not a file (empty)");
+        settings.diagnostics.emplace_back("ZR_CONFIG=\"\": not a file (empty)");
     } else {
         readFile(file != nullptr ? file : defaultFile, file != nullptr, settings);
     }
@@ -139,9 +139,9 @@ PlatformSettings PlatformSettings::read(const Environment& environment) {
         if (value == nullptr) {
             continue;
         }
-        if (const char* complaint = setting.apply(value, settings)) {
-            settings.complaints.push_back(std::string(setting.variable) + "=" + quoted(value) +
-                                          ": " + complaint);
+        if (const char* fault = setting.apply(value, settings)) {
+            settings.diagnostics.push_back(std::string(setting.variable) + "=" + quoted(value) +
+                                           ": " + fault);
         }
     }
     if (settings.dataDir.empty()) {

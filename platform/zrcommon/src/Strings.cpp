@@ -24,41 +24,46 @@ bool isScalarValue(std::uint32_t codePoint) {
     return codePoint <= 0x10FFFF && !surrogate;
 }
 
+/// What the first byte of a sequence of more than one tells.
+struct Lead {
+    std::size_t length;      ///< of the sequence; 0 when none begins with the byte
+    std::uint32_t bits;      ///< of the code point
+    std::uint32_t smallest;  ///< code point that needs that length
+};
+
+Lead leadOf(std::uint8_t byte) {
+    if ((byte & 0xE0U) == 0xC0) {
+        return {2, byte & 0x1FU, 0x80};
+    }
+    if ((byte & 0xF0U) == 0xE0) {
+        return {3, byte & 0x0FU, 0x800};
+    }
+    if ((byte & 0xF8U) == 0xF0) {
+        return {4, byte & 0x07U, 0x10000};
+    }
+    return {0, 0, 0};
+}
+
 Decoded decode(std::string_view text) {
     const auto byte = [&](std::size_t i) { return static_cast<std::uint8_t>(text[i]); };
-    const std::uint8_t lead = byte(0);
-    if (lead < 0x80) {
-        return {1, lead};
+    if (byte(0) < 0x80) {
+        return {1, byte(0)};
     }
-    std::size_t length = 0;
-    std::uint32_t codePoint = 0;
-    std::uint32_t smallest = 0;
-    if ((lead & 0xE0U) == 0xC0) {
-        length = 2;
-        codePoint = lead & 0x1FU;
-        smallest = 0x80;
-    } else if ((lead & 0xF0U) == 0xE0) {
-        length = 3;
-        codePoint = lead & 0x0FU;
-        smallest = 0x800;
-    } else if ((lead & 0xF8U) == 0xF0) {
-        length = 4;
-        codePoint = lead & 0x07U;
-        smallest = 0x10000;
-    }
-    if (length == 0 || text.size() < length) {
+    const Lead lead = leadOf(byte(0));
+    if (lead.length == 0 || text.size() < lead.length) {
         return {0, 0};
     }
-    for (std::size_t i = 1; i < length; ++i) {
+    std::uint32_t codePoint = lead.bits;
+    for (std::size_t i = 1; i < lead.length; ++i) {
         if ((byte(i) & 0xC0U) != 0x80) {
             return {0, 0};
         }
         codePoint = (codePoint << 6U) | (byte(i) & 0x3FU);
     }
-    if (codePoint < smallest || !isScalarValue(codePoint)) {
+    if (codePoint < lead.smallest || !isScalarValue(codePoint)) {
         return {0, 0};
     }
-    return {length, codePoint};
+    return {lead.length, codePoint};
 }
 
 void encode(std::uint32_t codePoint, std::string& out) {

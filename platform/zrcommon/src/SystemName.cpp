@@ -3,15 +3,25 @@
 #include <unistd.h>
 
 #include <array>
+#include <cerrno>
+
+#include "zrcommon/Errno.h"
 
 namespace ZR {
 
-std::string getSystemName() {
+SystemName readSystemName() {
     std::array<char, hostNameBufferSize> name{};
     if (::gethostname(name.data(), name.size() - 1) != 0) {
-        return {};
+        return {"", "the system does not tell its name: " + reasonOf(errno)};
     }
-    return name.data();
+    if (name.front() == '\0') {
+        return {"", "the system has no name"};
+    }
+    return {name.data(), ""};
+}
+
+std::string getSystemName() {
+    return readSystemName().name;
 }
 
 }  // namespace ZR

@@ -13,6 +13,7 @@
 #include "LinuxSupport.h"
 #include "ScriptedTransport.h"
 #include "StateReaders.h"
+#include "kit/HostNameFake.h"
 #include "zrcommon/SystemName.h"
 #include "zrlinux/LiveSource.h"
 
@@ -229,6 +230,23 @@ TEST_F(LiveMachineTest, TheComputerHasTheHostsName) {
     const auto* const name = tree->find(0, Properties::Name);
     ASSERT_NE(name, nullptr);
     EXPECT_EQ(name->value, PropertyValue{getSystemName()});
+}
+
+TEST_F(LiveMachineTest, AMachineThatDoesNotTellItsNameShowsItsInterfaces) {
+    LiveMachine& machine =
+        open({links(1), address(2, {192, 0, 2, 1}), links(1), address(2, {192, 0, 2, 1})});
+    {
+        const Testing::HostNameFails failing;
+        const auto tree = machine.read();
+        EXPECT_THAT(interfaceNames(*tree), ElementsAre("eth1"));
+        EXPECT_EQ(tree->node(0).description, "Computer");
+        EXPECT_EQ(tree->find(0, Properties::Name)->value, PropertyValue{});
+        EXPECT_THAT(tree->remarks(), ElementsAre("the system does not tell its name: Bad address"));
+        EXPECT_THAT(complaints_, ElementsAre("the system does not tell its name: Bad address"));
+    }
+    EXPECT_TRUE(machine.changed()) << "to be read again";
+    EXPECT_EQ(machine.read()->find(0, Properties::Name)->value, PropertyValue{getSystemName()});
+    EXPECT_FALSE(machine.changed());
 }
 
 TEST_F(LiveMachineTest, UnreadableLinksGiveNoInterfacesAndOneLine) {

@@ -38,11 +38,10 @@ int loadAndUnload() {
 class UnloadTest : public testing::Test {
   protected:
     void SetUp() override {
-        writeInPlace(path_,
-                     R"({"nodes": [{"type": "ComputerSystem"}, {"type": "ComputerSystem"}]})");
+        writeFile(path_, R"({"nodes": [{"type": "ComputerSystem"}, {"type": "ComputerSystem"}]})");
     }
 
-    const Directory directory_;
+    const TemporaryDirectory directory_;
     const std::string path_ = directory_ / "tree.json";
     const Variable tree_{"ZR_INSTRUMENTATION_TREE", path_};
     const Variable config_{"ZR_CONFIG", "/dev/null"};

@@ -11,7 +11,7 @@ namespace ZR {
 namespace {
 
 /// What an altered broker was asked: "CLASS in NAMESPACE is a PARENT?".
-std::vector<std::string>& questions() {
+std::vector<std::string>& requests() {
     static std::vector<std::string> asked;
     return asked;
 }
@@ -26,7 +26,7 @@ std::string describe(const CMPIObjectPath* path, const char* parent) {
 
 class ClassRelationsTest : public Testing::TestBroker {
   protected:
-    void SetUp() override { questions().clear(); }
+    void SetUp() override { requests().clear(); }
 
     bool related(const char* className, const char* parent) const {
         return ProviderUtilities::areClassesRelated(broker, nameSpace, className, parent);
@@ -83,33 +83,33 @@ TEST_F(ClassRelationsTest, BothDirectionsAreAskedInTheNamespaceGiven) {
     Testing::AlteredBroker altered(broker);
     altered.functions.classPathIsA = [](const CMPIBroker*, const CMPIObjectPath* path,
                                         const char* parent, CMPIStatus* rc) -> CMPIBoolean {
-        questions().push_back(describe(path, parent));
+        requests().push_back(describe(path, parent));
         *rc = {CMPI_RC_OK, nullptr};
         return 0;
     };
     EXPECT_FALSE(ProviderUtilities::areClassesRelated(altered.record(), "root/other", "A", "B"));
-    EXPECT_EQ(questions(),
+    EXPECT_EQ(requests(),
               (std::vector<std::string>{"A in root/other is a B?", "B in root/other is a A?"}));
 }
 
-TEST_F(ClassRelationsTest, AnswerThatComesWithAnErrorCountsAsNo) {
+TEST_F(ClassRelationsTest, ResultThatComesWithAnErrorCountsAsNo) {
     Testing::AlteredBroker altered(broker);
     altered.functions.classPathIsA = [](const CMPIBroker*, const CMPIObjectPath* path,
                                         const char* parent, CMPIStatus* rc) -> CMPIBoolean {
-        questions().push_back(describe(path, parent));
+        requests().push_back(describe(path, parent));
         *rc = {CMPI_RC_ERR_INVALID_CLASS, nullptr};
         return 1;
     };
     EXPECT_FALSE(ProviderUtilities::areClassesRelated(altered.record(), nameSpace, "A", "B"));
-    EXPECT_EQ(questions().size(), 2U);
+    EXPECT_EQ(requests().size(), 2U);
 }
 
 TEST_F(ClassRelationsTest, ErrorInOneDirectionDoesNotHideTheOther) {
     Testing::AlteredBroker altered(broker);
     altered.functions.classPathIsA = [](const CMPIBroker*, const CMPIObjectPath* path,
                                         const char* parent, CMPIStatus* rc) -> CMPIBoolean {
-        questions().push_back(describe(path, parent));
-        const bool first = questions().size() == 1;
+        requests().push_back(describe(path, parent));
+        const bool first = requests().size() == 1;
         *rc = {first ? CMPI_RC_ERR_INVALID_CLASS : CMPI_RC_OK, nullptr};
         return 1;
     };

@@ -39,14 +39,14 @@ class NullArgumentsTest : public Testing::TestBroker {
     Moniker moniker_;
 };
 
-TEST_F(NullArgumentsTest, CreationAnswersNull) {
+TEST_F(NullArgumentsTest, CreationReturnsNull) {
     EXPECT_EQ(Utilities::createObjectPath(noBroker, "C", nameSpace), nullptr);
     EXPECT_EQ(Utilities::createObjectPath(broker, noName, nameSpace), nullptr);
     EXPECT_EQ(Utilities::createInstance(noBroker, path_), nullptr);
     EXPECT_EQ(Utilities::createInstance(broker, noPath), nullptr);
 }
 
-TEST_F(NullArgumentsTest, ReadsOfAPathAnswerNothing) {
+TEST_F(NullArgumentsTest, ReadsOfAPathFindNothing) {
     CMPIObjectPath* reference = path_;
     EXPECT_EQ(Utilities::getNamespace(noPath), "");
     EXPECT_EQ(Utilities::getKeyCount(noPath), 0U);

@@ -92,7 +92,7 @@ class TestBroker : public testing::Test {
     const CMPIBroker* const broker = broker_.record();
 };
 
-/// The real broker with single functions of its table replaced, for answers that
+/// The real broker with single functions of its table replaced, for results that
 /// the real one does not give. The functions are plain ones: what they need to
 /// know must be global.
 class AlteredBroker {

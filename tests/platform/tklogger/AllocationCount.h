@@ -4,7 +4,7 @@
 
 namespace TKLog::Testing {
 
-/// Whether this build counts: the thread sanitizer of clang lets nobody replace
+/// Whether this build counts: the thread sanitizer of clang does not let a program replace
 /// operator new.
 #ifdef ALLOCATIONS_NOT_COUNTED
 inline constexpr bool countsAllocations = false;

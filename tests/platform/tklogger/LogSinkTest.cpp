@@ -135,7 +135,7 @@ TEST(LogSink, NoneAndUnknownNamesKeepNothing) {
     for (const char* name : {"none", "", "console", "FILE:/x", "stderr "}) {
         LogSink sink(name);
         EXPECT_TRUE(sink.keepsNothing()) << name;
-        say(sink, "to nobody");
+        say(sink, "to no sink");
     }
     for (const char* name : {"stderr", "syslog", "file:/x"}) {
         EXPECT_FALSE(LogSink(name).keepsNothing()) << name;

@@ -2,7 +2,7 @@
 
 namespace TKLog::Testing {
 
-/// How often the slow path of each road was taken so far, by all threads.
+/// How often the slow path of each channel was taken so far, by all threads.
 unsigned logSlowPathCalls() noexcept;
 unsigned traceSlowPathCalls() noexcept;
 

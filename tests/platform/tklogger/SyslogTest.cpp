@@ -1,5 +1,5 @@
 // The daemon is played by a socket of the test's own at /dev/log, in a mount name
-// space where nobody else sees it.
+// space that no other process sees.
 #include <gtest/gtest.h>
 #include <sys/socket.h>
 #include <sys/un.h>

@@ -92,7 +92,7 @@ TEST(TKLoggerThreads, FileIsRotatedUnderTheirHandsAndNoLineIsLost) {
     EXPECT_EQ(lines, std::size_t{4} * linesOfEach);
 }
 
-TEST(TKLoggerThreads, RoadsAreSetUpAnewUnderTheirHands) {
+TEST(TKLoggerThreads, ChannelsAreSetUpAnewMeanwhile) {
     const ZR::Testing::TemporaryDirectory directory;
     const auto setUp = [&directory](int i) {
         const std::string number = std::to_string(i % 3);

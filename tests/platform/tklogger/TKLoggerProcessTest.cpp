@@ -89,18 +89,18 @@ TEST_F(TKLoggerProcessTest, FirstLineMayBeOneThatIsDiscarded) {
     EXPECT_EQ(messagesIn(errors_), Messages{"yes 0"});
 }
 
-TEST_F(TKLoggerProcessTest, ComplaintsAreWrittenFirstOfAll) {
+TEST_F(TKLoggerProcessTest, DiagnosticsAreWrittenFirstOfAll) {
     writeFile(config_, "LOG_SINK=stderr\nTRACE_LEVEL=high\nLOGLEVEL=1\n");
     run({"log:6000:2:line"});
     EXPECT_EQ(messagesIn(errors_),
               (Messages{config_ + ":2: TRACE_LEVEL=\"high\": not a level (a number from 0)",
                         config_ + ":3: LOGLEVEL=\"1\": no such setting", "line 0", "line 1"}));
-    const LogRecord complaint = parseLog(readFile(errors_)).at(0);
-    EXPECT_EQ(complaint.level, 6000);
-    EXPECT_EQ(complaint.category, "ZR.Platform");
+    const LogRecord diagnostic = parseLog(readFile(errors_)).at(0);
+    EXPECT_EQ(diagnostic.level, 6000);
+    EXPECT_EQ(diagnostic.category, "ZR.Platform");
 }
 
-TEST_F(TKLoggerProcessTest, ComplaintsAreWrittenEvenWhenTheFirstLineIsForTheTrace) {
+TEST_F(TKLoggerProcessTest, DiagnosticsAreWrittenEvenWhenTheFirstLineIsForTheTrace) {
     writeFile(config_, "LOG_SINK=stderr\nTRACE_LEVEL=high\n");
     run({"trace:1:1:discarded", "log:6000:1:line"});
     EXPECT_EQ(
@@ -108,13 +108,13 @@ TEST_F(TKLoggerProcessTest, ComplaintsAreWrittenEvenWhenTheFirstLineIsForTheTrac
         (Messages{config_ + ":2: TRACE_LEVEL=\"high\": not a level (a number from 0)", "line 0"}));
 }
 
-TEST_F(TKLoggerProcessTest, ComplaintsFollowTheLevelOfTheLog) {
+TEST_F(TKLoggerProcessTest, DiagnosticsFollowTheLevelOfTheLog) {
     writeFile(config_, "LOG_SINK=stderr\nLOG_LEVEL=6001\nTRACE_LEVEL=high\n");
     run({"log:6001:1:line"});
     EXPECT_EQ(messagesIn(errors_), Messages{"line 0"});
 }
 
-TEST_F(TKLoggerProcessTest, ProcessThatSaysNothingWritesNoComplaints) {
+TEST_F(TKLoggerProcessTest, ProcessThatSaysNothingWritesNoDiagnostics) {
     writeFile(config_, "LOG_SINK=stderr\nTRACE_LEVEL=high\n");
     run({});
     EXPECT_EQ(readFile(errors_), "");

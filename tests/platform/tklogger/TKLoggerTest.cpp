@@ -44,7 +44,7 @@ TEST(TKLogger, LineArrivesWithAllItsParts) {
                                     "whispered"}));
 }
 
-TEST(TKLogger, RoadsDoNotMeet) {
+TEST(TKLogger, ChannelsDoNotMeet) {
     const LogCapture capture;
     log(1, "log");
     EXPECT_EQ(capture.logMessages(), Messages{"log"});
@@ -54,7 +54,7 @@ TEST(TKLogger, RoadsDoNotMeet) {
     EXPECT_EQ(capture.traceMessages(), Messages{"trace"});
 }
 
-TEST(TKLogger, EachRoadKeepsLinesOfItsOwnLevelOrAbove) {
+TEST(TKLogger, EachChannelKeepsLinesOfItsOwnLevelOrAbove) {
     const LogCapture capture(4000, 3000);
     for (const int level : {2999, 3000, 3999, 4000, 6000}) {
         log(level, std::to_string(level));
@@ -73,16 +73,16 @@ TEST(TKLogger, LevelsMayBeNegative) {
     EXPECT_EQ(capture.traceMessages(), Messages{"kept"});
 }
 
-TEST(TKLogger, RoadWithoutASinkKeepsNothing) {
+TEST(TKLogger, ChannelWithoutASinkKeepsNothing) {
     const LogCapture capture;
     TKLogger::configure({0, "none"}, {0, "none"});
-    log(INT_MAX, "to nobody");
-    trace(INT_MAX, "to nobody");
+    log(INT_MAX, "to no sink");
+    trace(INT_MAX, "to no sink");
     EXPECT_EQ(capture.logMessages(), Messages{});
     EXPECT_EQ(capture.traceMessages(), Messages{});
 }
 
-TEST(TKLogger, RoadsCanBeSetUpAnew) {
+TEST(TKLogger, ChannelsCanBeSetUpAnew) {
     const LogCapture first;
     log(1, "first");
     const LogCapture second(5000);
@@ -127,12 +127,12 @@ TEST(TKLogger, DiscardedLineDoesNotReachTheSlowPath) {
     EXPECT_EQ(Testing::traceSlowPathCalls(), traceCalls + 1);
 }
 
-TEST(TKLogger, LineForARoadWithoutASinkDoesNotReachTheSlowPath) {
+TEST(TKLogger, LineForAChannelWithoutASinkDoesNotReachTheSlowPath) {
     TKLogger::configure({0, "none"}, {0, "none"});
     const unsigned logCalls = Testing::logSlowPathCalls();
     const unsigned traceCalls = Testing::traceSlowPathCalls();
-    log(6000, "to nobody");
-    trace(6000, "to nobody");
+    log(6000, "to no sink");
+    trace(6000, "to no sink");
     EXPECT_EQ(Testing::logSlowPathCalls(), logCalls);
     EXPECT_EQ(Testing::traceSlowPathCalls(), traceCalls);
 }

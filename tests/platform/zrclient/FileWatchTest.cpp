@@ -20,7 +20,7 @@ class FileWatchTest : public testing::Test {
         return changed;
     }
 
-    const Directory directory_;
+    const TemporaryDirectory directory_;
     const std::string path_ = directory_ / "file";
 };
 
@@ -35,7 +35,7 @@ TEST_F(FileWatchTest, SaysChangedBeforeItWatches) {
 TEST_F(FileWatchTest, GoesOnSayingChangedUntilSubscribedAgain) {
     FileWatch watch(path_);
     watch.subscribe();
-    writeInPlace(path_, "x");
+    writeFile(path_, "x");
     EXPECT_TRUE(watch.changed());
     EXPECT_TRUE(watch.changed());
     watch.subscribe();
@@ -45,9 +45,9 @@ TEST_F(FileWatchTest, GoesOnSayingChangedUntilSubscribedAgain) {
 TEST_F(FileWatchTest, NoticesWhatHappensToTheFile) {
     FileWatch watch(path_);
     watch.subscribe();
-    writeInPlace(path_, "created");
+    writeFile(path_, "created");
     EXPECT_TRUE(noticed(watch));
-    writeInPlace(path_, "rewritten");
+    writeFile(path_, "rewritten");
     EXPECT_TRUE(noticed(watch));
     renameOver(path_, "replaced");
     EXPECT_TRUE(noticed(watch));
@@ -66,14 +66,14 @@ TEST_F(FileWatchTest, NoticesWhatHappensToTheFile) {
 }
 
 TEST_F(FileWatchTest, DoesNotMindReadersAndNeighbours) {
-    writeInPlace(path_, "x");
+    writeFile(path_, "x");
     FileWatch watch(path_);
     watch.subscribe();
     std::string content;
     std::ifstream(path_) >> content;
     EXPECT_EQ(content, "x");
-    writeInPlace(path_ + "2", "a neighbour");
-    writeInPlace(directory_ / "fil", "another");
+    writeFile(path_ + "2", "a neighbour");
+    writeFile(directory_ / "fil", "another");
     fs::remove(path_ + "2");
     EXPECT_FALSE(watch.changed());
 }
@@ -82,15 +82,15 @@ TEST_F(FileWatchTest, FollowsTheDirectoriesOnItsPath) {
     fs::create_directories(directory_ / "a/b");
     FileWatch watch(directory_ / "a/b/file");
     watch.subscribe();
-    writeInPlace(directory_ / "a/b/file", "x");
+    writeFile(directory_ / "a/b/file", "x");
     EXPECT_TRUE(noticed(watch));
     fs::rename(directory_ / "a", directory_ / "c");
     EXPECT_TRUE(noticed(watch));
-    writeInPlace(directory_ / "c/b/file", "no longer ours");
+    writeFile(directory_ / "c/b/file", "no longer ours");
     EXPECT_FALSE(watch.changed());
     fs::create_directories(directory_ / "a/b");
     EXPECT_TRUE(noticed(watch));
-    writeInPlace(directory_ / "a/b/file", "y");
+    writeFile(directory_ / "a/b/file", "y");
     EXPECT_TRUE(noticed(watch));
     fs::remove_all(directory_ / "a");
     EXPECT_TRUE(noticed(watch));
@@ -101,17 +101,17 @@ TEST_F(FileWatchTest, FollowsSymbolicLinks) {
     fs::create_directories(directory_ / "releases/2");
     fs::create_symlink("releases/1", directory_ / "current");
     fs::create_symlink(directory_ / "current/real", path_);
-    writeInPlace(directory_ / "releases/1/real", "1");
+    writeFile(directory_ / "releases/1/real", "1");
     FileWatch watch(path_);
     watch.subscribe();
-    writeInPlace(directory_ / "releases/1/real", "1 again");
+    writeFile(directory_ / "releases/1/real", "1 again");
     EXPECT_TRUE(noticed(watch));
     fs::create_symlink("releases/2", directory_ / "next");
     fs::rename(directory_ / "next", directory_ / "current");
     EXPECT_TRUE(noticed(watch));
-    writeInPlace(directory_ / "releases/1/real", "no longer ours");
+    writeFile(directory_ / "releases/1/real", "no longer ours");
     EXPECT_FALSE(watch.changed());
-    writeInPlace(directory_ / "releases/2/real", "2");
+    writeFile(directory_ / "releases/2/real", "2");
     EXPECT_TRUE(noticed(watch));
 }
 
@@ -123,12 +123,12 @@ TEST_F(FileWatchTest, ACircleOfLinksIsWatchedUntilItIsBroken) {
     EXPECT_FALSE(watch.changed());
     renameOver(directory_ / "other", "x");
     EXPECT_TRUE(noticed(watch));
-    writeInPlace(path_, "y");
+    writeFile(path_, "y");
     EXPECT_TRUE(noticed(watch));
 }
 
 TEST_F(FileWatchTest, AFileInPlaceOfADirectoryIsWatchedUntilItGoes) {
-    writeInPlace(path_, "no directory");
+    writeFile(path_, "no directory");
     FileWatch watch(path_ + "/below");
     watch.subscribe();
     EXPECT_FALSE(watch.changed());
@@ -145,12 +145,12 @@ TEST_F(FileWatchTest, ARelativePathStaysWhereItWas) {
     fs::current_path(before);
     fs::create_directory(directory_ / "x");
     watch.subscribe();
-    writeInPlace(path_, "x");
+    writeFile(path_, "x");
     EXPECT_TRUE(noticed(watch));
 }
 
 TEST_F(FileWatchTest, AFloodOfEventsCountsAsAChange) {
-    writeInPlace(path_, "x");
+    writeFile(path_, "x");
     FileWatch watch(path_);
     watch.subscribe();
     // More than the kernel keeps for one watcher; about two neighbours in turn,

@@ -28,6 +28,43 @@ TEST(InstrumentationService, ReadsNothingAheadOfTheFirstRequest) {
     EXPECT_EQ(state->polls, 0);
 }
 
+// Before main, and so before the settings are read.
+[[maybe_unused]] const int noTreeInTheSettings = ::setenv("ZR_INSTRUMENTATION_TREE", "", 1);
+
+TEST(InstrumentationService, SeesNothingWithoutATreeAndWithoutAMachine) {
+    InstrumentationService service;
+    EXPECT_TRUE(service.current()->nodes().empty());
+    EXPECT_TRUE(service.current()->nodes().empty());
+    EXPECT_EQ(service.readings(), 1U) << "nothing does not change";
+    EXPECT_FALSE(service.awaiting());
+}
+
+int machinesOpened = 0;
+
+std::unique_ptr<SnapshotSource> openCounted() {
+    ++machinesOpened;
+    const auto state = std::make_shared<HandSource::State>();
+    state->snapshot = tree("the machine");
+    return std::make_unique<HandSource>(state);
+}
+
+TEST(InstrumentationService, OpensTheMachineOnceAtItsFirstUse) {
+    InstrumentationService::setMachine(&openCounted);
+    machinesOpened = 0;
+    InstrumentationService service;
+    EXPECT_EQ(machinesOpened, 0);
+    EXPECT_FALSE(service.awaiting());
+    EXPECT_EQ(machinesOpened, 1);
+    EXPECT_EQ(service.latest()->node(0).description, "the machine");
+    EXPECT_EQ(service.current()->node(0).description, "the machine");
+    EXPECT_EQ(machinesOpened, 1);
+    // What is told later is for sources that are opened later.
+    InstrumentationService::setMachine(nullptr);
+    EXPECT_EQ(service.current()->node(0).description, "the machine");
+    InstrumentationService another;
+    EXPECT_TRUE(another.current()->nodes().empty());
+}
+
 TEST(InstrumentationService, ReadsAgainOnlyWhenTheSourceChanged) {
     const auto state = std::make_shared<HandSource::State>();
     state->snapshot = tree("first");
@@ -90,7 +127,7 @@ TEST(InstrumentationService, AReplacedSnapshotEndsWithItsLastCursor) {
 }
 
 /// Stands in for a slow source: a reading takes until the test lets it end.
-/// Awaits an answer until it was polled a number of times.
+/// Awaits a response until it was polled a number of times.
 class AwaitingSource : public SnapshotSource {
   public:
     explicit AwaitingSource(int polls) : polls_(polls) {}
@@ -99,22 +136,20 @@ class AwaitingSource : public SnapshotSource {
         return polls_ == 0;
     }
     [[nodiscard]] bool awaiting() override { return polls_ > 0; }
-    std::shared_ptr<const Snapshot> read() override {
-        return tree(awaiting() ? "asked" : "answered");
-    }
+    std::shared_ptr<const Snapshot> read() override { return tree(awaiting() ? "asked" : "told"); }
 
   private:
     int polls_;
 };
 
-TEST(InstrumentationService, SettlesWhenTheAnswerIsThere) {
+TEST(InstrumentationService, SettlesWhenTheResponseIsThere) {
     InstrumentationService service(std::make_unique<AwaitingSource>(3));
     service.settle(std::chrono::hours(1));
     EXPECT_FALSE(service.awaiting());
-    EXPECT_EQ(service.latest()->node(0).description, "answered");
+    EXPECT_EQ(service.latest()->node(0).description, "told");
 }
 
-TEST(InstrumentationService, TellsWithoutAReadingThatAnAnswerIsAwaited) {
+TEST(InstrumentationService, TellsWithoutAReadingThatAResponseIsAwaited) {
     InstrumentationService service(std::make_unique<AwaitingSource>(3));
     EXPECT_TRUE(service.awaiting());
     EXPECT_EQ(service.readings(), 0U);
@@ -197,7 +232,7 @@ std::string versionTree(unsigned version) {
     return text + "]}]}";
 }
 
-/// One walk over whatever version is there; answers whether all of it fitted.
+/// One walk over whatever version is there; returns whether all of it fitted.
 bool walkIsConsistent() {
     Instrumentation cursor;
     if (!cursor.selectNode(NodeType::NetworkInterface)) {
@@ -227,7 +262,7 @@ bool walkIsConsistent() {
 }
 
 TEST(InstrumentationService, SixtyFourThreadsWalkWhileTheTreeChanges) {
-    const Directory directory;
+    const TemporaryDirectory directory;
     const std::string path = directory / "tree.json";
     renameOver(path, versionTree(1));
     InstrumentationService& service = InstrumentationService::process();

@@ -32,10 +32,10 @@ constexpr const char* machine = R"({ "nodes": [
     "children": [ { "type": "NetworkInterface", "properties": { "Name": "bmc0" } } ] }
 ] })";
 
-class InstrumentationTest : public TreeTest {
+class InstrumentationTest : public SnapshotTreeTest {
   protected:
     void SetUp() override {
-        TreeTest::SetUp();
+        SnapshotTreeTest::SetUp();
         show(machine);
     }
 
@@ -94,7 +94,7 @@ TEST_F(InstrumentationTest, ReadsANumberUpToTheLargestThatFits) {
     EXPECT_EQ(number, 7U);
 }
 
-/// Every reader on every property that is not of its kind answers false and
+/// Every reader on every property that is not of its kind returns false and
 /// leaves the output as it was.
 void expectUnreadable(const Instrumentation& cursor, Properties id, bool asText, bool asNumber,
                       bool asFlag, bool asList) {
@@ -345,7 +345,7 @@ TEST_F(InstrumentationTest, CountsEachPlacementOfACursorOnce) {
     ++cursor;
     cursor.selectNode(std::string("/none"));
     cursor.selectNode(static_cast<NodeType>(1));
-    EXPECT_EQ(Instrumentation::nodeVisits(), before + 5) << "nothing is no node";
+    EXPECT_EQ(Instrumentation::nodeVisits(), before + 5) << "nothing is not a node";
     cursor.selectNode(NodeType::ComputerSystem);
     const Instrumentation copy = cursor;
     EXPECT_TRUE(copy);

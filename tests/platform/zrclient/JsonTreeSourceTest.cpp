@@ -5,14 +5,18 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include "kit/HostNameFake.h"
+#include "kit/LogCapture.h"
 #include "kit/ZrclientSupport.h"
 #include "zrclient/Instrumentation.h"
+#include "zrcommon/LogLevel.h"
 #include "zrcommon/SystemName.h"
 
 namespace ZR::Testing {
 namespace {
 
 using NodeLexicon::NodeType;
+using NodeLexicon::Properties;
 using testing::ElementsAre;
 using testing::EndsWith;
 using testing::HasSubstr;
@@ -47,23 +51,55 @@ class JsonTreeSourceTest : public testing::Test {
 
     static std::uint64_t readings() { return InstrumentationService::process().readings(); }
 
-    const LogFile log_;
-    const Directory directory_;
+    const LogCapture log_{LogLevel::failure};
+    const TemporaryDirectory directory_;
     const std::string path_ = directory_ / "tree.json";
 };
 
 TEST_F(JsonTreeSourceTest, ShowsTheFile) {
-    writeInPlace(path_, computer("Computer"));
+    writeFile(path_, computer("Computer"));
     use(path_);
     EXPECT_EQ(shown(), "Computer");
-    EXPECT_THAT(log_.lines(), IsEmpty());
+    EXPECT_THAT(log_.logMessages(), IsEmpty());
 }
 
 TEST_F(JsonTreeSourceTest, PutsInTheNameOfThisHost) {
     ASSERT_FALSE(getSystemName().empty());
-    writeInPlace(path_, computer("at ${HOSTNAME}"));
+    writeFile(path_, computer("at ${HOSTNAME}"));
     use(path_);
     EXPECT_EQ(shown(), "at " + getSystemName());
+}
+
+TEST_F(JsonTreeSourceTest, AMachineThatDoesNotTellItsNameKeepsItsNodes) {
+    writeFile(path_, R"({"nodes": [{"type": "ComputerSystem", "description": "Computer",
+        "properties": {"Name": "${HOSTNAME}"}, "children": [
+        {"type": "NetworkInterface", "properties": {"Name": "eth0"}}]}]})");
+    use(path_);
+    Instrumentation cursor;
+    std::string name = "as it was";
+    {
+        const HostNameFails failing;
+        errno = EPERM;
+        ASSERT_TRUE(cursor.selectNode(NodeType::ComputerSystem));
+        EXPECT_FALSE(cursor.getProperty(Properties::Name, name));
+        EXPECT_EQ(name, "as it was");
+        bool readOnly = true;
+        EXPECT_TRUE(cursor.isPropertyReadOnly(Properties::Name, readOnly)) << "it is there";
+        ASSERT_TRUE(cursor.selectNode(NodeType::NetworkInterface));
+        EXPECT_TRUE(cursor.getProperty(Properties::Name, name));
+        EXPECT_EQ(name, "eth0");
+        const std::uint64_t before = readings();
+        EXPECT_EQ(shown(), "Computer");
+        EXPECT_EQ(readings(), before) << "a file that did not change is not read again";
+    }
+    ASSERT_TRUE(cursor.selectNode(NodeType::ComputerSystem));
+    EXPECT_TRUE(cursor.getProperty(Properties::Name, name)) << "told by now";
+    EXPECT_EQ(name, getSystemName());
+    const std::uint64_t before = readings();
+    EXPECT_EQ(shown(), "Computer");
+    EXPECT_EQ(readings(), before);
+    EXPECT_THAT(log_.logMessages(),
+                ElementsAre(EndsWith("the system does not tell its name: Bad address")));
 }
 
 TEST_F(JsonTreeSourceTest, ARelativePathStaysWhereItWas) {
@@ -72,12 +108,12 @@ TEST_F(JsonTreeSourceTest, ARelativePathStaysWhereItWas) {
     use("tree.json");
     std::filesystem::current_path(before);
     EXPECT_EQ(shown(), "nothing");
-    writeInPlace(path_, computer("Computer"));
+    writeFile(path_, computer("Computer"));
     EXPECT_EQ(shown(), "Computer");
 }
 
 TEST_F(JsonTreeSourceTest, ReadsAnUnchangedFileOnce) {
-    writeInPlace(path_, computer("Computer"));
+    writeFile(path_, computer("Computer"));
     use(path_);
     EXPECT_EQ(shown(), "Computer");
     const std::uint64_t before = readings();
@@ -88,18 +124,18 @@ TEST_F(JsonTreeSourceTest, ReadsAnUnchangedFileOnce) {
 }
 
 TEST_F(JsonTreeSourceTest, TheVeryNextRequestSeesARewrittenFile) {
-    writeInPlace(path_, computer("v0"));
+    writeFile(path_, computer("v0"));
     use(path_);
     EXPECT_EQ(shown(), "v0");
     for (int version = 1; version <= 100; ++version) {
         const std::string name = "v" + std::to_string(version);
-        writeInPlace(path_, computer(name));
+        writeFile(path_, computer(name));
         ASSERT_EQ(shown(), name);
     }
 }
 
 TEST_F(JsonTreeSourceTest, TheVeryNextRequestSeesAReplacedFile) {
-    writeInPlace(path_, computer("v0"));
+    writeFile(path_, computer("v0"));
     use(path_);
     EXPECT_EQ(shown(), "v0");
     for (int version = 1; version <= 100; ++version) {
@@ -110,14 +146,14 @@ TEST_F(JsonTreeSourceTest, TheVeryNextRequestSeesAReplacedFile) {
 }
 
 TEST_F(JsonTreeSourceTest, TheVeryNextRequestSeesAFileGoAndComeBack) {
-    writeInPlace(path_, computer("Computer"));
+    writeFile(path_, computer("Computer"));
     use(path_);
     EXPECT_EQ(shown(), "Computer");
     ASSERT_TRUE(std::filesystem::remove(path_));
     EXPECT_EQ(shown(), "nothing");
     EXPECT_EQ(shown(), "nothing");
-    EXPECT_THAT(log_.lines(), SizeIs(1)) << "one line per reading, not per request";
-    writeInPlace(path_, computer("again"));
+    EXPECT_THAT(log_.logMessages(), SizeIs(1)) << "one line per reading, not per request";
+    writeFile(path_, computer("again"));
     EXPECT_EQ(shown(), "again");
     std::filesystem::rename(path_, path_ + ".away");
     EXPECT_EQ(shown(), "nothing");
@@ -133,7 +169,7 @@ TEST_F(JsonTreeSourceTest, TheVeryNextRequestSeesAFileAppearInANewDirectory) {
     EXPECT_EQ(readings(), before) << "the missing directory is watched for, not looked for";
     std::filesystem::create_directories(directory_ / "not/yet");
     EXPECT_EQ(shown(), "nothing");
-    writeInPlace(directory_ / "not/yet/tree.json", computer("here"));
+    writeFile(directory_ / "not/yet/tree.json", computer("here"));
     EXPECT_EQ(shown(), "here");
 }
 
@@ -151,26 +187,28 @@ TEST_F(JsonTreeSourceTest, AFileThatCannotBeReadIsLoggedOnce) {
     use(path_);
     EXPECT_EQ(shown(), "nothing");
     EXPECT_EQ(shown(), "nothing");
-    const auto lines = log_.lines();
+    const auto lines = log_.log();
     ASSERT_THAT(lines, SizeIs(1));
-    EXPECT_THAT(lines[0], HasSubstr(" 6000 ZR.Instrumentation "));
-    EXPECT_THAT(lines[0], EndsWith(path_ + ": No such file or directory"));
+    EXPECT_EQ(lines[0].level, 6000);
+    EXPECT_EQ(lines[0].category, "ZR.Instrumentation");
+    EXPECT_EQ(lines[0].message, path_ + ": No such file or directory");
 }
 
 TEST_F(JsonTreeSourceTest, AFaultIsLoggedOnceWithItsPlace) {
-    writeInPlace(path_, "{\"nodes\": [\n  {\"type\": 40}]}");
+    writeFile(path_, "{\"nodes\": [\n  {\"type\": 40}]}");
     use(path_);
     EXPECT_EQ(shown(), "nothing");
     EXPECT_EQ(shown(), "nothing");
-    const auto lines = log_.lines();
+    const auto lines = log_.log();
     ASSERT_THAT(lines, SizeIs(1));
-    EXPECT_THAT(lines[0], HasSubstr(" 6000 ZR.Instrumentation "));
-    EXPECT_THAT(lines[0], EndsWith(path_ + ":2:12: \"type\" must be a text"));
+    EXPECT_EQ(lines[0].level, 6000);
+    EXPECT_EQ(lines[0].category, "ZR.Instrumentation");
+    EXPECT_EQ(lines[0].message, path_ + ":2:12: \"type\" must be a text");
     // Another reading is another line.
-    writeInPlace(path_, "{}");
+    writeFile(path_, "{}");
     EXPECT_EQ(shown(), "nothing");
-    EXPECT_THAT(log_.lines(),
-                ElementsAre(lines[0], EndsWith(path_ + ":1:1: \"nodes\" is missing")));
+    EXPECT_THAT(log_.logMessages(),
+                ElementsAre(lines[0].message, EndsWith(path_ + ":1:1: \"nodes\" is missing")));
 }
 
 TEST_F(JsonTreeSourceTest, ADirectoryOrPipeInPlaceOfTheFileIsUnreadable) {
@@ -179,16 +217,16 @@ TEST_F(JsonTreeSourceTest, ADirectoryOrPipeInPlaceOfTheFileIsUnreadable) {
     EXPECT_EQ(shown(), "nothing");
     ASSERT_TRUE(std::filesystem::remove(path_));
     ASSERT_EQ(::mkfifo(path_.c_str(), 0600), 0);
-    EXPECT_EQ(shown(), "nothing") << "and nobody waits for a writer";
-    EXPECT_THAT(log_.lines(), SizeIs(2));
+    EXPECT_EQ(shown(), "nothing") << "and no writer is waited for";
+    EXPECT_THAT(log_.logMessages(), SizeIs(2));
 }
 
 TEST_F(JsonTreeSourceTest, ATooLargeFileIsNotRead) {
-    writeInPlace(path_, computer("Computer"));
+    writeFile(path_, computer("Computer"));
     std::filesystem::resize_file(path_, (std::uintmax_t{10} << 20U) + 1);
     use(path_);
     EXPECT_EQ(shown(), "nothing");
-    EXPECT_THAT(log_.lines(), ElementsAre(HasSubstr("File too large")));
+    EXPECT_THAT(log_.logMessages(), ElementsAre(HasSubstr("File too large")));
 }
 
 /// The limit of descriptors, lowered so that none is left, for a while.
@@ -209,7 +247,7 @@ class NoDescriptors {
 };
 
 TEST_F(JsonTreeSourceTest, WithoutAWatchEveryRequestReadsTheFile) {
-    writeInPlace(path_, computer("Computer"));
+    writeFile(path_, computer("Computer"));
     JsonTreeSource source(path_);
     {
         const NoDescriptors none;
@@ -223,11 +261,11 @@ TEST_F(JsonTreeSourceTest, WithoutAWatchEveryRequestReadsTheFile) {
 }
 
 TEST_F(JsonTreeSourceTest, ALackOfDescriptorsIsOverByItself) {
-    writeInPlace(path_, "{}");
+    writeFile(path_, "{}");
     JsonTreeSource source(path_);
     EXPECT_TRUE(source.read()->nodes().empty());
-    ASSERT_THAT(log_.lines(), SizeIs(1)) << "and the log has its descriptor";
-    writeInPlace(path_, computer("Computer"));
+    ASSERT_THAT(log_.logMessages(), SizeIs(1)) << "and the log has its descriptor";
+    writeFile(path_, computer("Computer"));
     {
         const NoDescriptors none;
         for (int round = 0; round < 5; ++round) {
@@ -238,7 +276,8 @@ TEST_F(JsonTreeSourceTest, ALackOfDescriptorsIsOverByItself) {
     EXPECT_TRUE(source.changed());
     EXPECT_EQ(source.read()->nodes().size(), 1U);
     EXPECT_FALSE(source.changed());
-    EXPECT_THAT(log_.lines(), ElementsAre(HasSubstr("is missing"), EndsWith("Too many open files")))
+    EXPECT_THAT(log_.logMessages(),
+                ElementsAre(HasSubstr("is missing"), EndsWith("Too many open files")))
         << "one line for all five";
 }
 

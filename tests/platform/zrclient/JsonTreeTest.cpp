@@ -137,6 +137,20 @@ TEST(JsonTree, PutsTheHostNameIntoEveryText) {
     EXPECT_EQ(snapshot->path(0), "/testhost.example");
 }
 
+TEST(JsonTree, WhatBearsTheNameOfANamelessMachineIsUnreadable) {
+    const auto tree = parseJsonTree(R"({"nodes": [{"type": "Fan${HOSTNAME}", "description":
+        "at <${HOSTNAME}>", "readOnly": ["Name"], "properties": {"Name": "${HOSTNAME}.example",
+        "IPv4Address": "192.0.2.1", "DHCPServerAddresses": ["192.0.2.2", "${HOSTNAME}"]}}]})",
+                                    "");
+    const Snapshot& snapshot = *std::get<0>(tree);
+    EXPECT_EQ(snapshot.node(0).type, "Fan");
+    EXPECT_EQ(snapshot.node(0).description, "at <>");
+    EXPECT_EQ(*snapshot.find(0, Properties::Name),
+              (SnapshotProperty{Properties::Name, true, PropertyValue()}));
+    EXPECT_EQ(snapshot.find(0, Properties::IPv4Address)->value, PropertyValue("192.0.2.1"));
+    EXPECT_EQ(snapshot.find(0, Properties::DHCPServerAddresses)->value, PropertyValue());
+}
+
 TEST(JsonTree, AHostNameIsNotExpandedAgain) {
     const JsonTree tree = parseJsonTree(R"({"nodes": [{"type": "${HOSTNAME}"}]})", "${HOSTNAME}");
     EXPECT_EQ(std::get<0>(tree)->node(0).type, "${HOSTNAME}");

@@ -14,7 +14,7 @@ namespace {
 using NodeLexicon::NodeType;
 using NodeLexicon::Properties;
 
-class OneMomentTest : public TreeTest {
+class OneMomentTest : public SnapshotTreeTest {
   protected:
     void showComputer(const std::string& name) {
         show(R"({"nodes": [{"type": "ComputerSystem", "properties": {"Name": ")" + name +

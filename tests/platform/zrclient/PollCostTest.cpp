@@ -27,7 +27,7 @@ using NodeLexicon::NodeType;
 bool allowNothingButPolling() {
     constexpr auto load = static_cast<std::uint16_t>(BPF_LD | BPF_W | BPF_ABS);
     constexpr auto jump = static_cast<std::uint16_t>(BPF_JMP | BPF_JEQ | BPF_K);
-    constexpr auto answer = static_cast<std::uint16_t>(BPF_RET | BPF_K);
+    constexpr auto verdict = static_cast<std::uint16_t>(BPF_RET | BPF_K);
     std::array<sock_filter, 7> program{{
         {load, 0, 0, offsetof(seccomp_data, nr)},
         {jump, 4, 0, SYS_read},
@@ -38,8 +38,8 @@ bool allowNothingButPolling() {
 #endif
         {jump, 2, 0, SYS_futex},
         {jump, 1, 0, SYS_exit_group},
-        {answer, 0, 0, SECCOMP_RET_KILL_PROCESS},
-        {answer, 0, 0, SECCOMP_RET_ALLOW},
+        {verdict, 0, 0, SECCOMP_RET_KILL_PROCESS},
+        {verdict, 0, 0, SECCOMP_RET_ALLOW},
     }};
     const sock_fprog filter{static_cast<unsigned short>(program.size()), program.data()};
     return ::prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0) == 0 &&
@@ -64,16 +64,16 @@ std::optional<long> readCalls(int ioFile) {
     return count;
 }
 
-enum Outcome : int { asPromised, wrongAnswer, readAgain, moreCalls, notConfined, notCounted };
+enum Outcome : int { asPromised, wrongResult, readAgain, moreCalls, notConfined, notCounted };
 
-/// Selects a type again and again, confined, and answers how it went.
+/// Selects a type again and again, confined, and returns how it went.
 Outcome selectConfined() {
     constexpr long rounds = 1000;
     Instrumentation cursor;
     // The first selection reads the file, the second is the first that polls.
     if (!cursor.selectNode(NodeType::ComputerSystem) ||
         !cursor.selectNode(NodeType::ComputerSystem)) {
-        return wrongAnswer;
+        return wrongResult;
     }
     const std::uint64_t readings = InstrumentationService::process().readings();
     // Never closed but by the end of the process: close() is not allowed by then.
@@ -85,7 +85,7 @@ Outcome selectConfined() {
     }
     for (long round = 0; round < rounds; ++round) {
         if (!cursor.selectNode(NodeType::ComputerSystem)) {
-            return wrongAnswer;
+            return wrongResult;
         }
     }
     if (InstrumentationService::process().readings() != readings) {
@@ -124,8 +124,8 @@ TEST(PollCost, SelectingATypeCostsOneReadAndNoOtherCallWhileNothingChanges) {
     if (underThreadSanitizer) {
         GTEST_SKIP() << "the thread sanitizer makes system calls of its own";
     }
-    const Directory directory;
-    writeInPlace(directory / "tree.json", R"({"nodes": [{"type": "ComputerSystem"}]})");
+    const TemporaryDirectory directory;
+    writeFile(directory / "tree.json", R"({"nodes": [{"type": "ComputerSystem"}]})");
     InstrumentationService::process().useSource(
         std::make_unique<JsonTreeSource>(directory / "tree.json"));
     const int outcome = outcomeOf(selectConfined);

@@ -34,9 +34,9 @@ TEST(SnapshotJson, WritesWhatIsReadBackAsEqual) {
 }
 
 TEST(SnapshotJson, WritesAFileThatTheSourceReadsBackAsEqual) {
-    const Directory directory;
+    const TemporaryDirectory directory;
     const auto snapshot = everyKind();
-    writeInPlace(directory / "tree.json", toJson(*snapshot));
+    writeFile(directory / "tree.json", toJson(*snapshot));
     EXPECT_TRUE(*JsonTreeSource(directory / "tree.json").read() == *snapshot);
 }
 

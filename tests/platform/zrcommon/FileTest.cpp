@@ -26,7 +26,7 @@ using Testing::inChild;
 using Testing::TemporaryDirectory;
 using Testing::writeFile;
 
-/// Reads a file that must be refused; answers why it was.
+/// Reads a file that must be refused; returns why it was.
 int reasonOf(const std::string& path, std::size_t limit = 1U << 20U) {
     errno = 0;
     const auto content = File::read(path, limit);
@@ -127,7 +127,7 @@ TEST_F(FileTest, FileWithoutPermissionIsNotRead) {
     writeFile(path_, "secret");
     ASSERT_EQ(::chmod(path_.c_str(), 0), 0);
     const auto result = inChild([this] {
-        // The root user may read everything; nobody may not.
+        // The root user may read everything; the user nobody may not.
         if (::geteuid() == 0 && (::chmod(directory_.path().c_str(), 0755) != 0 ||
                                  ::setresuid(65534, 65534, 65534) != 0)) {
             return std::string("cannot become nobody");
@@ -176,12 +176,6 @@ TEST_F(FileTest, NamesNeedNotBeText) {
     writeFile(name, "x");
     EXPECT_TRUE(File::exists(make_wstring(name)));
     EXPECT_EQ(File::read(name), "x");
-}
-
-TEST(FilePath, HasAFormForTheSystemAndOneForCallers) {
-    EXPECT_EQ(File::Path(std::string("/a\xC3\x9F\xFF")).wide(),
-              (std::wstring{L'/', L'a', L'\u00DF', wchar_t{0xDCFF}}));
-    EXPECT_EQ(File::Path(std::wstring_view(L"/a\u00DF")).bytes(), "/a\xC3\x9F");
 }
 
 }  // namespace

@@ -24,7 +24,7 @@ using Testing::inChild;
 using Testing::TemporaryDirectory;
 using Testing::writeFile;
 
-using Complaints = std::vector<std::string>;
+using Diagnostics = std::vector<std::string>;
 
 class PlatformSettingsTest : public testing::Test {
   protected:
@@ -73,7 +73,7 @@ TEST_F(PlatformSettingsTest, EmptyFileGivesTheDefaults) {
     EXPECT_EQ(settings.logSink, "syslog");
     EXPECT_EQ(settings.traceSink, "none");
     EXPECT_EQ(settings.instrumentationTree, "");
-    EXPECT_EQ(settings.complaints, Complaints{});
+    EXPECT_EQ(settings.diagnostics, Diagnostics{});
 }
 
 TEST_F(PlatformSettingsTest, EveryKeyIsOverriddenByItsVariable) {
@@ -105,29 +105,29 @@ TEST_F(PlatformSettingsTest, SinksAndLevelsOfEveryFormAreTaken) {
     for (const std::string sink : {"none", "stderr", "syslog", "file:x", "file:/a b"}) {
         const PlatformSettings settings = readContent("LOG_SINK=" + sink + "\n");
         EXPECT_EQ(settings.logSink, sink);
-        EXPECT_EQ(settings.complaints, Complaints{}) << sink;
+        EXPECT_EQ(settings.diagnostics, Diagnostics{}) << sink;
     }
     for (const int level : {0, 1, 6000, 2147483647}) {
         const PlatformSettings settings = readContent("LOG_LEVEL=" + std::to_string(level));
         EXPECT_EQ(settings.logLevel, level);
-        EXPECT_EQ(settings.complaints, Complaints{}) << level;
+        EXPECT_EQ(settings.diagnostics, Diagnostics{}) << level;
     }
 }
 
-TEST_F(PlatformSettingsTest, UnusableValuesAreComplaintsWithFileAndLine) {
+TEST_F(PlatformSettingsTest, UnusableValuesAreDiagnosticsWithFileAndLine) {
     PlatformSettings expected;
     expected.dataDir = "/d/";
-    expected.complaints = {
+    expected.diagnostics = {
         file_ + ":2: LOG_LEVEL=\"high\": not a level (a number from 0)",
         file_ + ":3: TRACE_LEVEL=\"-1\": not a level (a number from 0)",
         file_ + ":4: LOG_SINK=\"console\": not a sink (none, stderr, syslog or file:PATH)",
         file_ + ":5: TRACE_SINK=\"file:\": not a sink (none, stderr, syslog or file:PATH)",
         file_ + ":7: LOG_LEVELS=\"1\": no such setting",
         file_ + ":8: log_level=\"1\": no such setting",
-        file_ + ":9: no KEY=value line: \"LOG_LEVEL 1\"",
-        file_ + ":10: no KEY=value line: \"=1\"",
+        file_ + ":9: not a KEY=value line: \"LOG_LEVEL 1\"",
+        file_ + ":10: not a KEY=value line: \"=1\"",
     };
-    EXPECT_EQ(readContent("# complaints begin\n"
+    EXPECT_EQ(readContent("# diagnostics begin\n"
                           "LOG_LEVEL=high\n"
                           "TRACE_LEVEL=-1\n"
                           "LOG_SINK=console\n"
@@ -141,19 +141,19 @@ TEST_F(PlatformSettingsTest, UnusableValuesAreComplaintsWithFileAndLine) {
               expected);
 }
 
-TEST_F(PlatformSettingsTest, LevelsThatAreNoWholeNumberAreComplaints) {
+TEST_F(PlatformSettingsTest, LevelsThatAreNoWholeNumberAreDiagnostics) {
     for (const std::string value : {"", "6000x", "0x10", "1.5", "+1", "2147483648", "1 2"}) {
         const PlatformSettings settings = readContent("LOG_LEVEL=" + value + "\n");
         EXPECT_EQ(settings.logLevel, 6000) << value;
-        EXPECT_EQ(settings.complaints, Complaints{file_ + ":1: LOG_LEVEL=\"" + value +
-                                                  "\": not a level (a number from 0)"});
+        EXPECT_EQ(settings.diagnostics, Diagnostics{file_ + ":1: LOG_LEVEL=\"" + value +
+                                                    "\": not a level (a number from 0)"});
     }
 }
 
-TEST_F(PlatformSettingsTest, EmptyDataDirIsAComplaint) {
+TEST_F(PlatformSettingsTest, EmptyDataDirIsADiagnostic) {
     const PlatformSettings settings = readContent("DATA_DIR=/d\nDATA_DIR=\n");
-    EXPECT_EQ(settings.complaints,
-              Complaints{file_ + ":2: DATA_DIR=\"\": not a directory (empty)"});
+    EXPECT_EQ(settings.diagnostics,
+              Diagnostics{file_ + ":2: DATA_DIR=\"\": not a directory (empty)"});
     EXPECT_NE(settings.dataDir, "/d/");
 }
 
@@ -165,30 +165,30 @@ TEST_F(PlatformSettingsTest, UnusableValueGivesTheDefaultAndNotAnEarlierValue) {
     EXPECT_EQ(inFile.traceLevel, 6000);
     EXPECT_EQ(inFile.logSink, "syslog");
     EXPECT_EQ(inFile.traceSink, "none");
-    EXPECT_EQ(inFile.complaints.size(), 4U);
+    EXPECT_EQ(inFile.diagnostics.size(), 4U);
 
     variables_ = {{"ZR_LOG_LEVEL", "x"}};
     EXPECT_EQ(readContent("LOG_LEVEL=1\n").logLevel, 6000);
 }
 
-TEST_F(PlatformSettingsTest, UnusableVariablesAreComplaintsWithTheirName) {
+TEST_F(PlatformSettingsTest, UnusableVariablesAreDiagnosticsWithTheirName) {
     variables_ = {{"ZR_LOG_LEVEL", "x"}, {"ZR_TRACE_SINK", ""}, {"ZR_DATA_DIR", ""}};
-    EXPECT_EQ(readContent("").complaints,
-              (Complaints{"ZR_DATA_DIR=\"\": not a directory (empty)",
-                          "ZR_LOG_LEVEL=\"x\": not a level (a number from 0)",
-                          "ZR_TRACE_SINK=\"\": not a sink (none, stderr, syslog or file:PATH)"}));
+    EXPECT_EQ(readContent("").diagnostics,
+              (Diagnostics{"ZR_DATA_DIR=\"\": not a directory (empty)",
+                           "ZR_LOG_LEVEL=\"x\": not a level (a number from 0)",
+                           "ZR_TRACE_SINK=\"\": not a sink (none, stderr, syslog or file:PATH)"}));
 }
 
-TEST_F(PlatformSettingsTest, FileThatCannotBeReadIsAComplaint) {
+TEST_F(PlatformSettingsTest, FileThatCannotBeReadIsADiagnostic) {
     variables_ = {{"ZR_CONFIG", directory_ / "missing"}};
-    EXPECT_EQ(read().complaints, Complaints{directory_ / "missing: No such file or directory"});
+    EXPECT_EQ(read().diagnostics, Diagnostics{directory_ / "missing: No such file or directory"});
 
     variables_["ZR_CONFIG"] = directory_.path().string();
-    EXPECT_EQ(read().complaints, Complaints{directory_.path().string() + ": Is a directory"});
+    EXPECT_EQ(read().diagnostics, Diagnostics{directory_.path().string() + ": Is a directory"});
 
     ASSERT_EQ(::mkfifo(file_.c_str(), 0600), 0);
     variables_["ZR_CONFIG"] = file_;
-    EXPECT_EQ(read().complaints, Complaints{file_ + ": Invalid argument"});
+    EXPECT_EQ(read().diagnostics, Diagnostics{file_ + ": Invalid argument"});
 }
 
 TEST_F(PlatformSettingsTest, FileThatCannotBeReadLeavesTheVariablesInForce) {
@@ -196,9 +196,9 @@ TEST_F(PlatformSettingsTest, FileThatCannotBeReadLeavesTheVariablesInForce) {
     EXPECT_EQ(read().logLevel, 1);
 }
 
-TEST_F(PlatformSettingsTest, EmptyNameOfTheFileIsAComplaint) {
+TEST_F(PlatformSettingsTest, EmptyNameOfTheFileIsADiagnostic) {
     variables_ = {{"ZR_CONFIG", ""}};
-    EXPECT_EQ(read().complaints, Complaints{"ZR_CONFIG=\"\": not a file (empty)"});
+    EXPECT_EQ(read().diagnostics, Diagnostics{"ZR_CONFIG=\"\": not a file (empty)"});
 }
 
 TEST_F(PlatformSettingsTest, DataDirGetsItsEndSeparator) {
@@ -279,14 +279,14 @@ TEST_F(SystemSettingsTest, FileOfTheSystemIsReadWhenNoneIsNamed) {
 
 TEST_F(SystemSettingsTest, FileOfTheSystemNeedNotExist) {
     EXPECT_EQ(
-        onBareMachine([] { return std::to_string(readWithoutVariables().complaints.size()); }),
+        onBareMachine([] { return std::to_string(readWithoutVariables().diagnostics.size()); }),
         "0");
 }
 
-TEST_F(SystemSettingsTest, FileOfTheSystemThatCannotBeReadIsAComplaint) {
+TEST_F(SystemSettingsTest, FileOfTheSystemThatCannotBeReadIsADiagnostic) {
     EXPECT_EQ(onBareMachine([] {
                   std::filesystem::create_directories("/etc/zr/platform.conf");
-                  return readWithoutVariables().complaints.at(0);
+                  return readWithoutVariables().diagnostics.at(0);
               }),
               "/etc/zr/platform.conf: Is a directory");
 }

@@ -10,7 +10,7 @@ namespace ZR {
 
 namespace {
 
-/// The wide code unit that stands for a byte that is no text.
+/// The wide code unit that stands for a byte that is not text.
 wchar_t escaped(unsigned byte) {
     return static_cast<wchar_t>(0xDC00U + byte);
 }

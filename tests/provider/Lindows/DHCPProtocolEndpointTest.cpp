@@ -6,7 +6,7 @@
 #include <optional>
 
 #include "Elements.h"
-#include "HostNameFake.h"
+#include "kit/HostNameFake.h"
 #include "kit/Tree.h"
 
 namespace {
@@ -117,7 +117,7 @@ TEST_F(DHCPProtocolEndpointTest, FiltersAddUpAndEachStartsFromTheFirstInterface)
 
 TEST_F(DHCPProtocolEndpointTest, SystemNameFilterHoldsWhenTheHostNameCannotBeHad) {
     setTree({host({dhcpInterface("eth0")})});
-    const test::HostNameFails failing;
+    const ZR::Testing::HostNameFails failing;
     Endpoint endpoint;
     endpoint.setFilter(Endpoint::FilterBySystemName, "some other computer");
     EXPECT_THAT(walk(endpoint), ElementsAre("eth0"));
@@ -125,10 +125,10 @@ TEST_F(DHCPProtocolEndpointTest, SystemNameFilterHoldsWhenTheHostNameCannotBeHad
 
 TEST_F(DHCPProtocolEndpointTest, SystemNameFailsWithAFailureLineWhenTheHostNameCannotBeHad) {
     setTree({host({dhcpInterface("eth0")})});
-    const test::HostNameFails failing;
-    const LogCapture capture(6000, 6000);
     Endpoint endpoint;
     ASSERT_TRUE(static_cast<bool>(endpoint));
+    const ZR::Testing::HostNameFails failing;
+    const LogCapture capture(6000, 6000);
     EXPECT_EQ(text(endpoint, &Endpoint::getSystemName), std::nullopt);
     for (const auto& records : {capture.log(), capture.trace()}) {
         ASSERT_EQ(records.size(), 1U);

@@ -6,7 +6,7 @@
 #include <optional>
 
 #include "Elements.h"
-#include "HostNameFake.h"
+#include "kit/HostNameFake.h"
 #include "kit/Tree.h"
 
 namespace {
@@ -191,9 +191,9 @@ TEST_F(DHCPRemoteServiceAccessPointTest, FixedAndUnsupportedProperties) {
 
 TEST_F(DHCPRemoteServiceAccessPointTest, SystemNameFailsWithAFailureLineWhenItCannotBeHad) {
     setTree({host({dhcpInterface("eth0", {"192.0.2.1"})})});
-    const test::HostNameFails failing;
-    const LogCapture capture(6000, 6000);
     const AccessPoint point;
+    const ZR::Testing::HostNameFails failing;
+    const LogCapture capture(6000, 6000);
     EXPECT_EQ(text(point, &AccessPoint::getSystemName), std::nullopt);
     for (const auto& records : {capture.log(), capture.trace()}) {
         ASSERT_EQ(records.size(), 1U);
@@ -210,7 +210,7 @@ TEST_F(DHCPRemoteServiceAccessPointTest, SystemNameFilterComparesWithTheNameThat
     EXPECT_FALSE(accepts("eth0", {{AccessPoint::FilterBySystemName, hostName() + "x"}}));
     EXPECT_FALSE(accepts("eth0", {{AccessPoint::FilterBySystemName, ""}}));
     // The platform's name is then empty, while the record has none at all.
-    const test::HostNameFails failing;
+    const ZR::Testing::HostNameFails failing;
     EXPECT_TRUE(stands({{AccessPoint::FilterBySystemName, ""}}));
     EXPECT_FALSE(stands({{AccessPoint::FilterBySystemName, "some computer"}}));
 }

@@ -12,14 +12,14 @@ namespace ZR {
 /// What CMPI providers ask of the broker, without its tables in sight.
 ///
 /// Every function accepts null for broker, path, instance and name: nothing is
-/// dereferenced, creation answers null, counts answer 0, reads and writes answer
+/// dereferenced, creation returns null, counts return 0, reads and writes return
 /// false with their output left as it was. Objects made here belong to the host
 /// and end with the request. Safe on any thread that the host knows.
 ///
 /// Texts are set as CMPI_string, for which a broker is needed: the setters that
 /// take none use the one with which this thread last made a path or an instance.
 struct ProviderUtilities {
-    /// The identifier of a class that nobody here knows.
+    /// The identifier of every class without one of its own.
     static constexpr unsigned short unknownClass = 255;
 
     // Class identifiers. Names compare without regard to case.
@@ -27,9 +27,9 @@ struct ProviderUtilities {
     [[nodiscard]] static unsigned short getClassId(const CMPIObjectPath* path);
 
     /// Whether the host's class repository says that either class is the other
-    /// or an ancestor of the other. No class name (null or empty) is no
-    /// restriction and related to every class; a question that the host answers
-    /// with an error counts as no.
+    /// or an ancestor of the other. Without a class name (null or empty) there is no
+    /// restriction: it is related to every class. Where the host reports an error, the
+    /// classes are not related.
     [[nodiscard]] static bool areClassesRelated(const CMPIBroker* broker,
                                                 const std::string& nameSpace, const char* className,
                                                 const char* parent);

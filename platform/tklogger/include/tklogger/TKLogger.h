@@ -7,15 +7,15 @@
 
 namespace TKLog {
 
-/// Where one of the two roads of the service leads, and from which level on.
-struct Road {
+/// Where one of the two channels of the service leads, and from which level on.
+struct Channel {
     int level = 0;     ///< lines of this level or above are kept
     std::string sink;  ///< none, stderr, syslog or file:PATH
 
-    bool operator==(const Road&) const = default;
+    bool operator==(const Channel&) const = default;
 };
 
-/// The logging service: two roads, log and trace, that keep or discard each line
+/// The logging service: two channels, log and trace, that keep or discard each line
 /// by its level. Set up from the platform settings when the first line arrives,
 /// after which what is wrong with the settings is written first of all.
 ///
@@ -46,8 +46,8 @@ class TKLogger {
         static_cast<void>(text), static_cast<void>(a), static_cast<void>(b);
     }
 
-    /// Sets up both roads anew, in place of the platform settings.
-    static void configure(const Road& log, const Road& trace) noexcept;
+    /// Sets up both channels anew, in place of the platform settings.
+    static void configure(const Channel& log, const Channel& trace) noexcept;
 
     /// One line on its way to a sink. Borrows everything for the call.
     struct Line {
@@ -64,7 +64,7 @@ class TKLogger {
     static void keepTrace(const Line& line) noexcept;
 
     // INT_MIN until the service is set up: the first line, whatever its level,
-    // then takes the slow road, which sets it up.
+    // then takes the slow path, which sets it up.
     static inline std::atomic<int> logThreshold{INT_MIN};
     static inline std::atomic<int> traceThreshold{INT_MIN};
 

@@ -14,7 +14,7 @@ namespace ZR {
 ///
 /// A cursor stands on one node of one immutable snapshot, or on nothing; its
 /// snapshot stays alive as long as the cursor. Every operation is legal on a
-/// cursor that stands on nothing: it then answers false, or the empty text.
+/// cursor that stands on nothing: it then returns false, or the empty text.
 /// One cursor is used by one thread at a time; different cursors by any.
 /// No operation throws, apart from std::bad_alloc.
 class Instrumentation {

@@ -26,8 +26,8 @@ class InstrumentationService {
     static InstrumentationService& process();
 
     /// Tells how the running machine is opened. The service knows no operating system:
-    /// who puts a library or a program together says so before the first request.
-    /// Without it, and without a tree in the settings, there is nothing to see.
+    /// a library or a program that has one calls this before its first request. Without
+    /// it, and without a tree in the settings, snapshots are empty.
     static void setMachine(OpenMachine open) noexcept;
 
     explicit InstrumentationService(std::unique_ptr<SnapshotSource> source = nullptr);
@@ -35,11 +35,11 @@ class InstrumentationService {
     /// The newest state: polls the source, and reads it when it changed.
     [[nodiscard]] std::shared_ptr<const Snapshot> current();
 
-    /// Waits until the source awaits no answer any more, at most that long. No request
+    /// Waits until the source awaits no response any more, at most that long. No request
     /// needs this; it is for a program that ends after one.
     void settle(std::chrono::milliseconds limit);
 
-    /// Whether the source awaits an answer, for which it may ask now. Reads nothing.
+    /// Whether the source awaits a response, for which it may ask now. Reads nothing.
     [[nodiscard]] bool awaiting();
 
     /// The state that was read last, without polling; reads once if there is none.
@@ -52,6 +52,7 @@ class InstrumentationService {
     [[nodiscard]] std::uint64_t readings() const noexcept { return readings_.load(); }
 
   private:
+    [[nodiscard]] SnapshotSource& openedSource();
     [[nodiscard]] std::shared_ptr<const Snapshot> published();
     std::shared_ptr<const Snapshot> readSource();
 

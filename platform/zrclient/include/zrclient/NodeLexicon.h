@@ -1,6 +1,8 @@
 #pragma once
 
 #include <array>
+#include <cstddef>
+#include <optional>
 #include <string_view>
 
 /// The numbering of node types and properties that the instrumentation tree and
@@ -33,7 +35,7 @@ enum class AddressSource : unsigned int {
 };
 
 /// The value of AddressOrigin (CIM 2.41) for a value of Properties::AddressSource;
-/// 0, which is unknown, for a number that is none.
+/// 0, which is unknown, for any other number.
 constexpr unsigned short addressOriginOf(unsigned int addressSource) noexcept {
     // Unknown, DHCP, BOOTP, static, IPv4 link local, other.
     constexpr std::array<unsigned short, 6> origins{0, 4, 5, 3, 6, 1};
@@ -60,5 +62,49 @@ inline constexpr std::array<Entry<Properties>, 7> properties{{
     {Properties::InterfaceState, "InterfaceState"},
     {Properties::DHCPEnabled, "DHCPEnabled"},
 }};
+
+/// The name of a number; empty for a number that the lexicon does not have.
+template <typename Number, std::size_t size>
+constexpr std::string_view nameIn(const std::array<Entry<Number>, size>& entries, Number number) {
+    for (const Entry<Number>& entry : entries) {
+        if (entry.number == number) {
+            return entry.name;
+        }
+    }
+    return {};
+}
+
+/// The number of a name, whose case counts; nothing for any other text.
+template <typename Number, std::size_t size>
+constexpr std::optional<Number> numberIn(const std::array<Entry<Number>, size>& entries,
+                                         std::string_view name) {
+    for (const Entry<Number>& entry : entries) {
+        if (entry.name == name) {
+            return entry.number;
+        }
+    }
+    return std::nullopt;
+}
+
+constexpr std::string_view nameOf(NodeType type) {
+    return nameIn(nodeTypes, type);
+}
+constexpr std::string_view nameOf(Properties id) {
+    return nameIn(properties, id);
+}
+constexpr std::optional<NodeType> nodeTypeOf(std::string_view name) {
+    return numberIn(nodeTypes, name);
+}
+constexpr std::optional<Properties> propertyOf(std::string_view name) {
+    return numberIn(properties, name);
+}
+
+/// The node descriptions by which computers are told apart: any but that of the service
+/// processor is the host's.
+inline constexpr const char* hostDescription = "Computer";
+inline constexpr const char* serviceProcessorDescription = "BMC";
+
+/// The name of the service processor as a computer.
+inline constexpr const char* serviceProcessorName = "BMC:-1";
 
 }  // namespace ZR::NodeLexicon

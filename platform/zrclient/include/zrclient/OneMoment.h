@@ -9,7 +9,7 @@ class Snapshot;
 /// As long as it lives, every cursor that this thread places stands in one snapshot:
 /// the newest one at the time when the first node type is selected. A request that
 /// places cursors one after the other, and inside of each other, thus tells of one
-/// moment, and asks the source once. Of several inside each other the outermost counts.
+/// moment, and asks the source once. Of several that are nested the outermost counts.
 class OneMoment {
   public:
     OneMoment() noexcept;

@@ -14,7 +14,7 @@
 namespace ZR {
 
 /// The value of one property. std::monostate is a value that no reader can
-/// take: it is present (isPropertyReadOnly answers) but unreadable.
+/// take: the property is present (isPropertyReadOnly finds it) but unreadable.
 using PropertyValue =
     std::variant<std::monostate, bool, std::uint64_t, std::string, std::vector<std::string>>;
 
@@ -57,8 +57,8 @@ class Snapshot {
     /// The property of a node, or null. O(properties of the node).
     [[nodiscard]] const SnapshotProperty* find(Index index, NodeLexicon::Properties id) const;
 
-    /// Where a property of a node came from, for people; empty when nobody asked the
-    /// source to tell, or there is no such property.
+    /// Where a property of a node came from, for people; empty when the source was not
+    /// asked to tell, or there is no such property.
     [[nodiscard]] std::string_view origin(Index index, NodeLexicon::Properties id) const;
 
     /// What could not be read, or not for certain, one sentence each.
@@ -70,14 +70,10 @@ class Snapshot {
     /// The path of a node: the keys from the root down, each after a "/". O(depth).
     [[nodiscard]] std::string path(Index index) const;
 
-    /// The node that a path names, or none. O(depth).
+    /// The node that a path names, or none. O(nodes up to that one).
     [[nodiscard]] Index resolve(std::string_view path) const noexcept;
 
-    /// How many keys resolve() compared on this thread so far: the unit in which
-    /// the look-up of paths is measured.
-    [[nodiscard]] static std::uint64_t keyComparisons() noexcept;
-
-    /// Equal nodes with equal properties in equal order, and equal words about them.
+    /// Equal nodes with equal properties in equal order, equal origins and remarks.
     bool operator==(const Snapshot&) const = default;
 
   private:
@@ -90,7 +86,6 @@ class Snapshot {
     std::vector<SnapshotProperty> properties_;
     std::vector<std::string> origins_;  // of the properties in their order; may be fewer
     std::vector<std::string> remarks_;
-    std::vector<Index> pathIndex_;  // open addressing by the hash of the path
     Index firstNetworkInterface_ = none;
     Index firstComputerSystem_ = none;
 };
@@ -108,8 +103,8 @@ class SnapshotBuilder {
     /// replaced in its place. Without a node there is nothing to add to.
     void property(NodeLexicon::Properties id, PropertyValue value, bool readOnly = false);
 
-    /// Says where the properties that are added from now on come from. Nobody who says
-    /// nothing pays anything.
+    /// Says where the properties that are added from now on come from. Costs nothing as
+    /// long as it is not called.
     void origin(std::string text) { origin_ = std::move(text); }
 
     /// Adds what could not be read, or not for certain.

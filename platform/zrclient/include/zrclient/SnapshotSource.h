@@ -16,17 +16,17 @@ class SnapshotSource {
     virtual ~SnapshotSource() = default;
 
     /// Whether something may have changed since the last read(). Never blocks;
-    /// costs one system call while nothing changes, and one more while an answer is
-    /// awaited. True before the first read.
+    /// costs one system call while nothing changes, and one more while a response
+    /// is awaited. True before the first read.
     [[nodiscard]] virtual bool changed() = 0;
 
-    /// Whether an answer is on its way that a later read() will give: one that may be
-    /// slow is never waited for. Asks for it if that is due; reads nothing else.
+    /// Whether a response is on its way that a later read() will tell of: one that may
+    /// be slow is never waited for. Asks for it if that is due; reads nothing else.
     [[nodiscard]] virtual bool awaiting() { return false; }
 
     /// Reads the present state. Never returns null: what cannot be read is logged and
     /// left out. Throws nothing but std::bad_alloc, after which changed() is true.
-    /// Waits for answers, as of the kernel or a bus, somewhat over a second at most.
+    /// Waits for responses, as of the kernel or a bus, somewhat over a second at most.
     [[nodiscard]] virtual std::shared_ptr<const Snapshot> read() = 0;
 };
 

@@ -37,7 +37,7 @@ void push(std::string_view path, std::vector<std::string>& ahead) {
     }
 }
 
-/// Where a symbolic link leads; nothing when the path is none.
+/// Where a symbolic link leads; nothing when the path is not one.
 std::optional<std::string> targetOf(const std::string& path) {
     std::array<char, PATH_MAX> target{};
     const ssize_t size = ::readlink(path.c_str(), target.data(), target.size());
@@ -133,25 +133,26 @@ bool FileWatch::changed() {
     alignas(inotify_event) std::array<char, 4096> buffer;  // NOLINT(*-member-init): read() fills it
     while (true) {
         const ssize_t size = ::read(inotify_.get(), buffer.data(), buffer.size());
-        if (size < 0 && errno == EINTR) {
-            continue;
-        }
-        if (size < 0 && errno == EAGAIN) {
-            return changed_;
-        }
-        if (size <= 0) {
+        if (size > 0) {
+            takeAll({buffer.data(), static_cast<std::size_t>(size)});
+        } else if (size == 0 || (errno != EINTR && errno != EAGAIN)) {
             // Nothing that Linux does on a healthy descriptor; begin again.
             changed_ = wayChanged_ = true;
             return true;
+        } else if (errno == EAGAIN) {
+            return changed_;
         }
-        for (std::size_t at = 0; at < static_cast<std::size_t>(size);) {
-            inotify_event event{};
-            std::memcpy(&event, buffer.data() + at, sizeof event);
-            at += sizeof event;
-            const char* name = buffer.data() + at;  // padded with zeros, or absent
-            take(event, std::string_view(name, ::strnlen(name, event.len)));
-            at += event.len;
-        }
+    }
+}
+
+void FileWatch::takeAll(std::string_view events) {
+    while (!events.empty()) {
+        inotify_event event{};
+        std::memcpy(&event, events.data(), sizeof event);
+        events.remove_prefix(sizeof event);
+        const std::string_view name = events.substr(0, event.len);  // padded with zeros, or absent
+        take(event, name.substr(0, name.find('\0')));
+        events.remove_prefix(name.size());
     }
 }
 

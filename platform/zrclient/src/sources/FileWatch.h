@@ -45,6 +45,7 @@ class FileWatch {
 
     [[nodiscard]] bool watchPath();
     void dropAllBut(const std::vector<Step>& needed, const std::vector<Step>& former);
+    void takeAll(std::string_view events);
     void take(const inotify_event& event, std::string_view name);
 
     std::string path_;

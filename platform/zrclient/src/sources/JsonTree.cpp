@@ -4,7 +4,6 @@
 #include <array>
 #include <cstdint>
 #include <nlohmann/json.hpp>
-#include <optional>
 #include <utility>
 #include <vector>
 
@@ -17,6 +16,8 @@ namespace {
 using Json = nlohmann::json;
 
 constexpr unsigned deepest = 64;
+
+constexpr std::string_view hostNameVariable = "${HOSTNAME}";
 
 /// What the next value is, or what the array or object around it is.
 enum class Slot : std::uint8_t {
@@ -67,15 +68,6 @@ const char* wanted(Slot slot) {
     }
 }
 
-std::optional<NodeLexicon::Properties> propertyOf(std::string_view name) {
-    for (const auto& entry : NodeLexicon::properties) {
-        if (entry.name == name) {
-            return entry.number;
-        }
-    }
-    return std::nullopt;
-}
-
 /// A node as far as it has been read. Nodes are kept in the order in which their
 /// objects begin, which is document order, depth first.
 struct ReadNode {
@@ -87,7 +79,7 @@ struct ReadNode {
 };
 
 /// Takes the parser's events into nodes. A fault ends the parsing: each handler
-/// answers whether to go on.
+/// returns whether to go on.
 class TreeReader {
   public:
     TreeReader(std::string_view text, const std::string& hostName)
@@ -118,13 +110,14 @@ class TreeReader {
                 node().description = expanded(value);
                 break;
             case Slot::property:
-                set(expanded(value));
+                set(isReadable(value) ? PropertyValue(expanded(value)) : PropertyValue());
                 break;
             case Slot::propertyEntry:
+                listIsReadable_ = listIsReadable_ && isReadable(value);
                 list_.push_back(expanded(value));
                 break;
             case Slot::readOnlyEntry:
-                if (const auto id = propertyOf(value)) {
+                if (const auto id = NodeLexicon::propertyOf(value)) {
                     node().readOnly.push_back(*id);
                 }
                 break;
@@ -160,19 +153,7 @@ class TreeReader {
     bool key(std::string& name) {
         if (ignoredDepth_ == 0) {
             Frame& frame = frames_.back();
-            slot_ = Slot::ignored;
-            if (frame.what == Slot::document && name == "nodes") {
-                slot_ = Slot::nodes;
-            } else if (frame.what == Slot::properties) {
-                if (const auto id = propertyOf(name)) {
-                    slot_ = Slot::property;
-                    property_ = *id;
-                }
-            } else if (frame.what == Slot::node) {
-                for (const auto& [known, slot] : nodeKeys) {
-                    slot_ = known == name ? slot : slot_;
-                }
-            }
+            slot_ = slotOf(name, frame.what);
             // Which of the two would count is a guess that the file's author
             // should not have to make. Properties are another matter: a later
             // one overrides.
@@ -258,6 +239,26 @@ class TreeReader {
         }
     };
 
+    /// What the value of a key is in an object of that kind.
+    Slot slotOf(std::string_view name, Slot object) {
+        if (object == Slot::document && name == "nodes") {
+            return Slot::nodes;
+        }
+        if (object == Slot::properties) {
+            if (const auto id = NodeLexicon::propertyOf(name)) {
+                property_ = *id;
+                return Slot::property;
+            }
+        }
+        if (object == Slot::node) {
+            const auto* const known =
+                std::find_if(nodeKeys.begin(), nodeKeys.end(),
+                             [name](const auto& key) { return key.first == name; });
+            return known == nodeKeys.end() ? Slot::ignored : known->second;
+        }
+        return Slot::ignored;
+    }
+
     [[nodiscard]] Slot next() const {
         if (ignoredDepth_ > 0) {
             return Slot::ignored;
@@ -295,7 +296,7 @@ class TreeReader {
         }
     }
 
-    /// Takes a value that is no text, if any such may stand in the slot.
+    /// Takes a value that is not a text, if any such may stand in the slot.
     bool take(PropertyValue value, Slot slot) {
         if (slot == Slot::property) {
             set(std::move(value));
@@ -313,7 +314,7 @@ class TreeReader {
 
     bool unreadable(std::size_t lookAhead) { return scalar(PropertyValue(), lookAhead); }
 
-    /// An object or array whose content nobody reads, if it may stand here.
+    /// An object or array whose content is not read, if it may stand here.
     bool startIgnored(Slot slot) {
         if (!take(PropertyValue(), slot)) {
             return fail(tokens_.start(), wanted(slot));
@@ -349,14 +350,18 @@ class TreeReader {
         return std::string(message.substr(0, longest)) + "...";
     }
 
+    /// False for a text that bears the name of a machine that tells none.
+    [[nodiscard]] bool isReadable(std::string_view text) const {
+        return !hostName_.empty() || text.find(hostNameVariable) == std::string_view::npos;
+    }
+
     [[nodiscard]] std::string expanded(const std::string& text) const {
-        constexpr std::string_view variable = "${HOSTNAME}";
         std::string result;
         std::size_t done = 0;
-        for (std::size_t found = text.find(variable); found != std::string::npos;
-             found = text.find(variable, done)) {
+        for (std::size_t found = text.find(hostNameVariable); found != std::string::npos;
+             found = text.find(hostNameVariable, done)) {
             result.append(text, done, found - done).append(hostName_);
-            done = found + variable.size();
+            done = found + hostNameVariable.size();
         }
         return result.append(text, done);
     }

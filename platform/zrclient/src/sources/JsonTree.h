@@ -10,7 +10,7 @@
 
 namespace ZR {
 
-/// Why a text is no JSON tree, and where: lines and columns count from 1,
+/// Why a text is not a JSON tree, and where: lines and columns count from 1,
 /// columns in bytes.
 struct JsonTreeFault {
     std::size_t line = 1;
@@ -23,8 +23,10 @@ struct JsonTreeFault {
 using JsonTree = std::variant<std::shared_ptr<const Snapshot>, JsonTreeFault>;
 
 /// Reads the text of a JSON tree. Total: any bytes give a snapshot, never null,
-/// or the first fault. "${HOSTNAME}" in a text becomes the name given. Nodes, and
-/// values that nobody reads, may be nested 64 levels deep. Throws std::bad_alloc only.
+/// or the first fault. "${HOSTNAME}" in a text becomes the name given. Without a
+/// name (an empty one), a property with it is unreadable, and types and descriptions,
+/// which cannot be so, have nothing in its place. Nodes, and
+/// values that are not read, may be nested 64 levels deep. Throws std::bad_alloc only.
 [[nodiscard]] JsonTree parseJsonTree(std::string_view text, const std::string& hostName);
 
 }  // namespace ZR

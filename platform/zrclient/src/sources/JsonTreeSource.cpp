@@ -3,13 +3,14 @@
 #include <cerrno>
 #include <cstddef>
 #include <exception>
-#include <system_error>
 #include <utility>
 #include <variant>
 
 #include "sources/JsonTree.h"
 #include "tklogger/TKLogger.h"
+#include "zrcommon/Errno.h"
 #include "zrcommon/File.h"
+#include "zrcommon/LogLevel.h"
 #include "zrcommon/SystemName.h"
 
 namespace ZR {
@@ -20,7 +21,7 @@ namespace {
 constexpr std::size_t largestFile = std::size_t{10} << 20U;
 
 /// Whether what made the reading fail lies in the file, so that the watch tells
-/// when it may be over. Too many open files, or a directory that lets nobody in,
+/// when it may be over. Too many open files, or a directory without permission,
 /// come to an end unseen.
 bool isOfTheFile(int error) {
     return error == ENOENT || error == ENOTDIR || error == EISDIR || error == EINVAL ||
@@ -33,7 +34,8 @@ JsonTreeSource::JsonTreeSource(const std::string& path)
     : watch_(path), empty_(SnapshotBuilder().build()) {}
 
 bool JsonTreeSource::changed() {
-    return readAgain_ || watch_.changed();
+    // No file tells when the machine gets a name.
+    return readAgain_ || watch_.changed() || (nameless_ && !getSystemName().empty());
 }
 
 std::shared_ptr<const Snapshot> JsonTreeSource::read() {
@@ -45,7 +47,7 @@ std::shared_ptr<const Snapshot> JsonTreeSource::read() {
         // Out of memory, in the main: the machine shows nothing until there is some.
         readAgain_ = true;
         try {
-            complain(watch_.path() + ": " + error.what());
+            report(watch_.path() + ": " + error.what());
         } catch (const std::exception&) {  // NOLINT(bugprone-empty-catch)
             // Without memory for a message there is none.
         }
@@ -58,35 +60,34 @@ std::shared_ptr<const Snapshot> JsonTreeSource::tryToRead() {
     if (!text) {
         const int reason = errno;
         readAgain_ = !isOfTheFile(reason);
-        complain(watch_.path() + ": " + std::generic_category().message(reason));
+        report(watch_.path() + ": " + reasonOf(reason));
         return empty_;
     }
-    const std::string hostName = getSystemName();
-    if (hostName.empty()) {
-        const int reason = errno;
-        readAgain_ = true;
-        complain("the system does not tell its name: " + std::generic_category().message(reason));
-        return empty_;
-    }
-    JsonTree tree = parseJsonTree(*text, hostName);
+    const SystemName system = readSystemName();
+    nameless_ = system.name.empty();
+    JsonTree tree = parseJsonTree(*text, system.name);
     if (const auto* fault = std::get_if<JsonTreeFault>(&tree)) {
-        complain(watch_.path() + ":" + std::to_string(fault->line) + ":" +
-                 std::to_string(fault->column) + ": " + fault->reason);
+        report(watch_.path() + ":" + std::to_string(fault->line) + ":" +
+               std::to_string(fault->column) + ": " + fault->reason);
         return empty_;
     }
-    lastComplaint_.clear();
+    if (nameless_) {
+        report(system.diagnostic);
+    } else {
+        lastReported_.clear();
+    }
     return std::get<std::shared_ptr<const Snapshot>>(std::move(tree));
 }
 
-void JsonTreeSource::complain(const std::string& message) {
+void JsonTreeSource::report(const std::string& message) {
     // When every request reads the file, the log would overflow with what it knows.
-    if ((readAgain_ || watch_.isBlind()) && message == lastComplaint_) {
+    if ((readAgain_ || watch_.isBlind()) && message == lastReported_) {
         return;
     }
-    lastComplaint_ = message;
-    constexpr int failure = 6000;
+    lastReported_ = message;
     TKLog::TKLogger::logLevelMessage("zrclient/JsonTreeSource", "read", __LINE__,
-                                     "ZR.Instrumentation", failure, nullptr, 0, 0, message);
+                                     "ZR.Instrumentation", LogLevel::failure, nullptr, 0, 0,
+                                     message);
 }
 
 }  // namespace ZR

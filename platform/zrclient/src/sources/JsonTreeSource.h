@@ -22,11 +22,12 @@ class JsonTreeSource : public SnapshotSource {
 
   private:
     [[nodiscard]] std::shared_ptr<const Snapshot> tryToRead();
-    void complain(const std::string& message);
+    void report(const std::string& message);
 
     FileWatch watch_;
     std::shared_ptr<const Snapshot> empty_;
-    std::string lastComplaint_;
+    std::string lastReported_;
+    bool nameless_ = false;   // the machine told no name for the tree that was read last
     bool readAgain_ = false;  // the next request is to try again, whatever the watch says
 };
 

@@ -3,21 +3,19 @@
 #include <cstddef>
 #include <optional>
 #include <string>
-#include <string_view>
+#include <utility>
 
 namespace ZR {
 
 /// What the platform asks of files.
 class File {
   public:
-    /// The name of a file, as bytes for the system and as wide text for callers.
+    /// The name of a file, as the system's bytes.
     class Path {
       public:
         explicit Path(std::string bytes) : bytes_(std::move(bytes)) {}
-        explicit Path(std::wstring_view wide);
 
         [[nodiscard]] const std::string& bytes() const noexcept { return bytes_; }
-        [[nodiscard]] std::wstring wide() const;
 
       private:
         std::string bytes_;
@@ -28,7 +26,7 @@ class File {
     [[nodiscard]] static bool exists(const std::wstring& path);
 
     /// The whole content of a regular file; nullopt when it cannot be opened or
-    /// read, is no regular file, or is larger than `limit` bytes (errno tells why;
+    /// read, is not a regular file, or is larger than `limit` bytes (errno tells why;
     /// EFBIG for the last).
     [[nodiscard]] static std::optional<std::string> read(const std::string& path,
                                                          std::size_t limit = 64U << 20U);

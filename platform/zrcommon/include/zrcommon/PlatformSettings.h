@@ -4,13 +4,15 @@
 #include <string>
 #include <vector>
 
+#include "zrcommon/LogLevel.h"
+
 namespace ZR {
 
 /// The settings of the platform: read once per process from the file that the
 /// environment variable ZR_CONFIG names, else from /etc/zr/platform.conf; a
 /// setting KEY is overridden by the environment variable ZR_KEY.
 struct PlatformSettings {
-    static constexpr int defaultLevel = 6000;
+    static constexpr int defaultLevel = LogLevel::failure;
 
     std::string dataDir;              ///< DATA_DIR; always ends with "/"
     std::string instrumentationTree;  ///< INSTRUMENTATION_TREE; empty: the live machine
@@ -21,7 +23,7 @@ struct PlatformSettings {
 
     /// What could not be used, one text each with its file and line or its
     /// variable; the setting then has its default.
-    std::vector<std::string> complaints;
+    std::vector<std::string> diagnostics;
 
     bool operator==(const PlatformSettings&) const = default;
 

@@ -5,7 +5,7 @@
 
 namespace ZR {
 
-/// Wide text of a UTF-8 text. A byte that is no part of valid UTF-8 becomes the
+/// Wide text of a UTF-8 text. A byte that is not part of valid UTF-8 becomes the
 /// code unit 0xDC00 plus the byte, so that make_string gives back exactly the
 /// bytes that came in: file names need not be text.
 [[nodiscard]] std::wstring make_wstring(std::string_view text);

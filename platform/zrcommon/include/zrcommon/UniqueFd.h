@@ -27,7 +27,7 @@ class UniqueFd {
 
     void reset(int fd = -1) noexcept {
         if (fd_ >= 0) {
-            // Linux frees the descriptor whatever close() answers; a second try
+            // Linux frees the descriptor whatever close() returns; a second try
             // could close one that another thread has opened meanwhile.
             ::close(fd_);
         }

@@ -4,6 +4,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <sys/socket.h>
+#include <unistd.h>
 
 #include <atomic>
 #include <chrono>
@@ -48,6 +49,18 @@ class Watched {
     std::unique_ptr<SnapshotSource> source_ = openLiveSource();
     std::shared_ptr<const Snapshot> tree_;
 };
+
+TEST(Kernel, AMachineWithoutANameShowsItsInterfaces) {
+    ZR_NEEDS_NAMESPACES();
+    EXPECT_TRUE(passesInNamespaces(30, [] {
+        ASSERT_EQ(::sethostname("", 0), 0);
+        run("ip link add br0 type bridge");
+        Watched machine;
+        EXPECT_THAT(interfaceNames(machine.now()), ElementsAre("br0"));
+        EXPECT_EQ(machine.now().find(0, Properties::Name)->value, PropertyValue{});
+        EXPECT_THAT(machine.now().remarks(), Contains("the system has no name"));
+    }));
+}
 
 TEST(Kernel, EachChangeShowsInTheVeryNextRead) {
     ZR_NEEDS_NAMESPACES();

@@ -1,9 +1,7 @@
-#include "HostNameFake.h"
+#include "kit/HostNameFake.h"
 
 #include <cerrno>
 #include <cstddef>
-
-#include "zrclient/InstrumentationService.h"
 
 namespace {
 
@@ -25,15 +23,13 @@ int __wrap_gethostname(char* name, std::size_t size) {
 }
 // NOLINTEND(bugprone-reserved-identifier)
 
-namespace test {
+namespace ZR::Testing {
 
 HostNameFails::HostNameFails() {
-    // The machine itself is not read without its name.
-    static_cast<void>(ZR::InstrumentationService::process().current());
     fails = true;
 }
 HostNameFails::~HostNameFails() {
     fails = false;
 }
 
-}  // namespace test
+}  // namespace ZR::Testing
