@@ -9,6 +9,7 @@
 #include <string>
 #include <system_error>
 
+#include "cimom/Names.h"
 #include "cimom/ObjectPathText.h"
 #include "client/Failure.h"
 #include "text/DisplayText.h"

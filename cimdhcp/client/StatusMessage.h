@@ -3,7 +3,6 @@
 #include <string>
 #include <string_view>
 
-#include "cimom/Cim.h"
 #include "client/Answer.h"
 
 namespace cimdhcp {

@@ -1,7 +1,6 @@
 #pragma once
 
 #include "arguments/CommandLine.h"
-#include "cimom/Cim.h"
 #include "client/Answer.h"
 #include "client/Client.h"
 

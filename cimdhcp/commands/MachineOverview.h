@@ -4,7 +4,7 @@
 #include <string>
 #include <vector>
 
-#include "cimom/Cim.h"
+#include "cimom/Instance.h"
 #include "client/ClassLookup.h"
 #include "zrclient/Snapshot.h"
 

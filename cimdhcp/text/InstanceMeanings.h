@@ -2,7 +2,6 @@
 
 #include <string>
 
-#include "cimom/Cim.h"
 #include "cimom/ClassRepository.h"
 
 namespace cimdhcp {

@@ -2,7 +2,7 @@
 
 #include <algorithm>
 
-#include "cimom/Cim.h"
+#include "cimom/Names.h"
 #include "client/Failure.h"
 #include "text/DisplayText.h"
 

@@ -106,7 +106,7 @@ TEST_F(RemoteServer, AnswersThatAreNoneAreTold) {
                                 "<IRETURNVALUE><INSTANCE CLASSNAME='A'><PROPERTY NAME='n' "
                                 "TYPE='uint8'><VALUE>-1</VALUE></PROPERTY></INSTANCE>"
                                 "</IRETURNVALUE>")),
-              "the answer holds what is no value: n: \"-1\" is no uint8");
+              "the answer holds what is no value: n: \"-1\" is not of type uint8");
     std::string deep;
     for (int depth = 0; depth < 100000; ++depth) {
         deep += "<a>";
