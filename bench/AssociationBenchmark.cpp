@@ -28,7 +28,7 @@ namespace {
 
 using namespace ZR::DHCPClientProvider;  // NOLINT(google-build-using-namespace)
 using Keys = std::vector<std::pair<std::string, std::string>>;
-using Kind = cimom::broker::ResultCollector::Kind;
+using Kind = test::Host::Kind;
 using ZR::Moniker;
 
 /// A path of one of the classes at the ends, for the interface of this name.

@@ -73,8 +73,7 @@ void floorOfInstances(benchmark::State& state) {
     }
     bench::CountingResult result;
     for (auto _ : state) {
-        host.request(cimom::broker::ResultCollector::Kind::instances,
-                     test::pathOf("QVXZR_DHCPProtocolEndpoint"),
+        host.request(test::Host::Kind::instances, test::pathOf("QVXZR_DHCPProtocolEndpoint"),
                      [&](auto* /*context*/, auto* /*collector*/, auto* /*path*/) {
                          makePlainInstances(host.broker(), endpoints, &result.record);
                          return CMPIStatus{CMPI_RC_OK, nullptr};
@@ -84,7 +83,7 @@ void floorOfInstances(benchmark::State& state) {
 }
 
 void ask(test::Host& host, const char* className, const CMPIResult& result) {
-    host.request(cimom::broker::ResultCollector::Kind::instances, test::pathOf(className),
+    host.request(test::Host::Kind::instances, test::pathOf(className),
                  [&](auto* context, auto* /*collector*/, auto* path) {
                      return host.instanceTable().enumerateInstances(nullptr, context, &result, path,
                                                                     nullptr);

@@ -22,6 +22,7 @@
 #include <utility>
 #include <vector>
 
+#include "cimom/ObjectManager.h"
 #include "wbem/Server.h"
 
 namespace {

@@ -2,7 +2,7 @@
 
 #include <string>
 
-#include "cimom/Cim.h"
+#include "cimom/ObjectPath.h"
 #include "client/ClassLookup.h"
 
 namespace cimdhcp {

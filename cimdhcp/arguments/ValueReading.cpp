@@ -9,6 +9,7 @@
 #include <string>
 #include <system_error>
 
+#include "cimom/Names.h"
 #include "cimom/ObjectPathText.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"

@@ -2,7 +2,6 @@
 
 #include <string_view>
 
-#include "cimom/Cim.h"
 #include "cimom/ClassRepository.h"
 
 namespace cimdhcp {

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <utility>
 
+#include "cimom/Names.h"
 #include "client/StatusMessage.h"
 #include "text/DisplayText.h"
 #include "zrclient/InstrumentationService.h"

@@ -7,7 +7,8 @@
 #include <cstring>
 #include <new>
 
-#include "cimom/Cim.h"
+#include "cimom/Names.h"
+#include "cimom/Value.h"
 #include "text/DisplayText.h"
 
 namespace cimdhcp {

@@ -4,6 +4,7 @@
 #include <unordered_set>
 #include <utility>
 
+#include "cimom/Names.h"
 #include "cimxml/ClassReader.h"
 #include "cimxml/Errors.h"
 #include "client/StatusMessage.h"

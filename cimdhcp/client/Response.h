@@ -4,7 +4,8 @@
 #include <string>
 #include <vector>
 
-#include "cimom/Cim.h"
+#include "cimom/Instance.h"
+#include "cimom/Status.h"
 
 namespace cimdhcp {
 

@@ -11,7 +11,7 @@
 #include <string_view>
 #include <system_error>
 
-#include "cimom/Cim.h"
+#include "cimom/Names.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
 #include "zrcommon/File.h"

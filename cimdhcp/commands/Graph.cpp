@@ -7,6 +7,7 @@
 #include <string_view>
 #include <utility>
 
+#include "cimom/Names.h"
 #include "text/DisplayText.h"
 #include "text/ValueMeaning.h"
 

@@ -4,7 +4,6 @@
 #include <string>
 #include <vector>
 
-#include "cimom/Cim.h"
 #include "client/Client.h"
 
 namespace cimdhcp {

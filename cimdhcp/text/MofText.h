@@ -3,7 +3,7 @@
 #include <string>
 #include <string_view>
 
-#include "cimom/Cim.h"
+#include "cimom/Value.h"
 
 namespace cimdhcp {
 

@@ -3,7 +3,6 @@
 #include <optional>
 #include <string>
 
-#include "cimom/Cim.h"
 #include "cimom/ClassRepository.h"
 
 namespace cimdhcp {

@@ -13,8 +13,8 @@ namespace {
 constexpr std::size_t largestChunk = std::size_t{1024} * 1024;
 constexpr std::size_t cloneChunk = 512;
 constexpr std::size_t fileChunk = std::size_t{512} * 1024;
-/// What stays in memory, whoever asks for it: enough for a thousand instances, which
-/// would cost a fifth more in a file.
+/// What an arena has up to this size stays in memory: enough for a thousand instances,
+/// which would cost a fifth more in a file.
 constexpr std::size_t warm = std::size_t{4} * 1024 * 1024;
 
 }  // namespace
@@ -86,7 +86,7 @@ void* Arena::growInFile(std::size_t size) noexcept {
             file_ = std::make_unique<TemporaryFile>();
         }
     } catch (const std::exception&) {
-        // Without a disk there is still the memory.
+        // Without a disk, memory is used.
         return nullptr;
     }
     void* const memory = file_->map(fileSize_, size);
@@ -94,10 +94,10 @@ void* Arena::growInFile(std::size_t size) noexcept {
         return nullptr;
     }
     fileSize_ += size;
-    // Pages that go come back from the file if anybody asks; that they are advised
-    // to go is no promise, and nothing depends on it. The last chunk but one goes:
-    // of an object in the last one, parts may still be missing, and touching one page
-    // brings its neighbours back as well.
+    // Pages that go come back from the file when they are used again; the advice to
+    // let them go is not a promise, and nothing depends on it. The chunk before the last
+    // goes: an object in the last one may still be written, and touching one page brings
+    // its neighbours back as well.
     Chunk* const full = chunks_ == nullptr ? nullptr : chunks_->previous;
     if (full != nullptr && full->mapped > 0) {
         static_cast<void>(::madvise(full, full->mapped, MADV_DONTNEED));

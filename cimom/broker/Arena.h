@@ -16,8 +16,8 @@ namespace cimom::broker {
 /// destroyed one by one, so only trivially destructible types may live there.
 ///
 /// A provider may go on using whatever it got until its request ends, also what it
-/// has long delivered. What an arena has beyond some megabytes is therefore backed
-/// by a temporary file, and leaves the process' memory while nobody touches it.
+/// has long handed over. What an arena has beyond some megabytes is therefore backed
+/// by a temporary file, and leaves the process' memory while it is not used.
 ///
 /// An arena of a request belongs to the thread that runs the request and takes
 /// no lock. A clone has an arena of its own, whose root is the clone; it may

@@ -7,9 +7,9 @@
 
 namespace cimom::broker {
 
-Broker::Broker(const Schema& schema, ObjectManager* manager) noexcept
-    : schema_(&schema),
-      manager_(manager),
+Broker::Broker(const ClassRepository& classes, RequestHandler* handler) noexcept
+    : classes_(&classes),
+      handler_(handler),
       record_{this, &brokerTable, &encapsulationTable, &threadTable, &memoryTable} {}
 
 Broker::~Broker() = default;

@@ -7,11 +7,11 @@
 #include <unordered_map>
 
 #include "broker/BrokerMemory.h"
-#include "mof/Schema.h"
 
 namespace cimom {
-class ObjectManager;
-}
+class ClassRepository;
+class RequestHandler;
+}  // namespace cimom
 
 namespace cimom::broker {
 
@@ -20,9 +20,9 @@ namespace cimom::broker {
 /// Safe for concurrent use.
 class Broker {
   public:
-    /// The schema must outlive the broker. Without a manager, a provider's
+    /// Classes and handler must outlive the broker. Without a handler, a provider's
     /// requests to other providers are not supported.
-    explicit Broker(const Schema& schema, ObjectManager* manager = nullptr) noexcept;
+    explicit Broker(const ClassRepository& classes, RequestHandler* handler = nullptr) noexcept;
     ~Broker();
     Broker(const Broker&) = delete;
     Broker& operator=(const Broker&) = delete;
@@ -31,8 +31,8 @@ class Broker {
     /// Null for a record that is none of these.
     static Broker* of(const CMPIBroker* record) noexcept;
 
-    [[nodiscard]] const Schema& schema() const noexcept { return *schema_; }
-    [[nodiscard]] ObjectManager* manager() const noexcept { return manager_; }
+    [[nodiscard]] const ClassRepository& classes() const noexcept { return *classes_; }
+    [[nodiscard]] RequestHandler* handler() const noexcept { return handler_; }
     [[nodiscard]] MemoryPool& memory() noexcept { return memory_; }
 
     /// A copy of the context for a thread of the provider; owned by the broker
@@ -52,8 +52,8 @@ class Broker {
         unsigned threads;
     };
 
-    const Schema* schema_;
-    ObjectManager* manager_;
+    const ClassRepository* classes_;
+    RequestHandler* handler_;
     CMPIBroker record_;
     MemoryPool memory_;
     std::mutex mutex_;

@@ -15,6 +15,7 @@
 #include "broker/objects/BrokerInstance.h"
 #include "broker/objects/BrokerObjectPath.h"
 #include "broker/objects/BrokerStatus.h"
+#include "cimom/ClassRepository.h"
 
 namespace cimom::broker {
 
@@ -41,7 +42,7 @@ Object* made(const CMPIBroker* mb, CMPIStatus* rc, Make&& make) {
     });
 }
 
-/// An unknown class is no error: nothing of the instance is checked then.
+/// An unknown class is not an error: nothing of the instance is checked then.
 CMPIInstance* newInstance(const CMPIBroker* mb, const CMPIObjectPath* op, CMPIStatus* rc) {
     return made<CMPIInstance>(mb, rc, [op](const Broker&, CMPIrc& code) -> CMPIInstance* {
         const PathRecord* const path = pathOf(op);
@@ -56,7 +57,7 @@ CMPIInstance* newInstance(const CMPIBroker* mb, const CMPIObjectPath* op, CMPISt
 CMPIObjectPath* newObjectPath(const CMPIBroker* mb, const char* nameSpace, const char* className,
                               CMPIStatus* rc) {
     return made<CMPIObjectPath>(mb, rc, [=](const Broker& broker, CMPIrc&) {
-        return makePath(arena(), &broker.schema(), orEmpty(nameSpace), orEmpty(className));
+        return makePath(arena(), &broker.classes(), orEmpty(nameSpace), orEmpty(className));
     });
 }
 
@@ -113,18 +114,18 @@ CMPIDateTime* newDateTimeFromChars(const CMPIBroker* mb, const char* text, CMPIS
     });
 }
 
-/// There are no queries here.
+/// Queries are not supported.
 CMPISelectExp* newSelectExp(const CMPIBroker*, const char*, const char*, CMPIArray** projection,
                             CMPIStatus* rc) {
     if (projection != nullptr) {
         *projection = nullptr;
     }
-    answer(rc, CMPI_RC_ERR_NOT_SUPPORTED);
+    setStatus(rc, CMPI_RC_ERR_NOT_SUPPORTED);
     return nullptr;
 }
 
-/// The namespace must be given, which one does not matter: all have the same
-/// classes. A class that is not known is of its own name's kind only.
+/// The namespace must be given; all namespaces have the same classes. An unknown
+/// class matches its own name only.
 CMPIBoolean classPathIsA(const CMPIBroker* mb, const CMPIObjectPath* op, const char* type,
                          CMPIStatus* rc) {
     return guarded<CMPIBoolean>(rc, 0, [=](CMPIrc& code) -> CMPIBoolean {
@@ -140,7 +141,7 @@ CMPIBoolean classPathIsA(const CMPIBroker* mb, const CMPIObjectPath* op, const c
         }
         const std::string_view className = path->className->view();
         const bool is = (!className.empty() && sameName(className, type)) ||
-                        broker->schema().repository().isA(className, type);
+                        broker->classes().isA(className, type);
         return is ? 1 : 0;
     });
 }
@@ -218,7 +219,7 @@ CMPIString* getMessage2(const CMPIBroker* mb, const char*, CMPIMsgFileHandle, co
 
 // NOLINTEND(cert-dcl50-cpp)
 
-/// Providers log by means of their own.
+/// Not supported: providers have logs of their own.
 CMPIStatus logMessage(const CMPIBroker*, int, const char*, const char*, const CMPIString*) {
     return statusOf(CMPI_RC_ERR_NOT_SUPPORTED);
 }

@@ -3,6 +3,7 @@
 #include "broker/Conversion.h"
 #include "broker/RequestScope.h"
 #include "broker/objects/BrokerStatus.h"
+#include "cimom/ClassRepository.h"
 
 namespace cimom::broker {
 
@@ -13,16 +14,16 @@ CMPIData qualifierData(const PathRecord& path, const Qualifier* qualifier, CMPIr
         code = CMPI_RC_ERR_NOT_FOUND;
         return {};
     }
-    return toData(RequestScope::current().arena(), path.schema, qualifier->value);
+    return toData(RequestScope::current().arena(), path.classes, qualifier->value);
 }
 
-const ClassIndex* classOf(const PathRecord& path, CMPIrc& code) {
-    const ClassIndex* const index =
-        path.schema == nullptr ? nullptr : path.schema->find(path.className->view());
-    if (index == nullptr) {
+const ClassDeclaration* classOf(const PathRecord& path, CMPIrc& code) {
+    const ClassDeclaration* const declaration =
+        path.classes == nullptr ? nullptr : path.classes->find(path.className->view());
+    if (declaration == nullptr) {
         code = CMPI_RC_ERR_INVALID_CLASS;
     }
-    return index;
+    return declaration;
 }
 
 }  // namespace
@@ -33,9 +34,9 @@ CMPIData classQualifier(const PathRecord* path, const char* name, CMPIStatus* rc
             code = path == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_ERR_INVALID_PARAMETER;
             return {};
         }
-        const ClassIndex* const index = classOf(*path, code);
-        return index == nullptr ? CMPIData{}
-                                : qualifierData(*path, index->declaration().qualifier(name), code);
+        const ClassDeclaration* const declaration = classOf(*path, code);
+        return declaration == nullptr ? CMPIData{}
+                                      : qualifierData(*path, declaration->qualifier(name), code);
     });
 }
 
@@ -46,11 +47,11 @@ CMPIData propertyQualifier(const PathRecord* path, const char* property, const c
             code = path == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_ERR_INVALID_PARAMETER;
             return {};
         }
-        const ClassIndex* const index = classOf(*path, code);
-        if (index == nullptr) {
+        const ClassDeclaration* const declaration = classOf(*path, code);
+        if (declaration == nullptr) {
             return {};
         }
-        const PropertyDeclaration* const declared = index->property(property);
+        const PropertyDeclaration* const declared = declaration->property(property);
         if (declared == nullptr) {
             code = CMPI_RC_ERR_NO_SUCH_PROPERTY;
             return {};

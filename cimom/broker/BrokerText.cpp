@@ -51,36 +51,11 @@ std::string describe(const CMPIData& data) {
     if (isArrayType(data.type)) {
         return describe(*arrayOf(data.value.array));
     }
-    switch (data.type) {
-        case CMPI_string:
-            return '"' + std::string(textOf(data.value.string)) + '"';
-        case CMPI_dateTime:
-            return '"' + std::string(dateTimeOf(data.value.dateTime)->text->view()) + '"';
-        case CMPI_ref:
-            return '"' + textOf(*pathOf(data.value.ref)) + '"';
-        case CMPI_instance:
-            return broker::describe(data.value.inst);
-        default:
-            break;
+    if (data.type == CMPI_instance) {
+        return broker::describe(data.value.inst);
     }
     const Value value = toModel(data);
-    const Scalar& scalar = *value.scalar();
-    if (const auto* truth = std::get_if<bool>(&scalar)) {
-        return *truth ? "TRUE" : "FALSE";
-    }
-    if (const auto* positive = std::get_if<std::uint64_t>(&scalar)) {
-        return std::to_string(*positive);
-    }
-    if (const auto* number = std::get_if<std::int64_t>(&scalar)) {
-        return std::to_string(*number);
-    }
-    if (const auto* real = std::get_if<double>(&scalar)) {
-        return std::to_string(*real);
-    }
-    if (const auto* character = std::get_if<char16_t>(&scalar)) {
-        return std::to_string(static_cast<unsigned>(*character));
-    }
-    return {};
+    return scalarText(*value.scalar()).value_or("");
 }
 
 }  // namespace

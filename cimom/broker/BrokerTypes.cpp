@@ -1,5 +1,7 @@
 #include "broker/BrokerTypes.h"
 
+#include "cimom/ClassDeclaration.h"
+
 namespace cimom::broker {
 
 std::optional<Type> cimType(CMPIType scalarType) noexcept {

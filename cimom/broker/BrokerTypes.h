@@ -5,8 +5,11 @@
 #include <cstring>
 #include <optional>
 
-#include "cimom/Cim.h"
-#include "cimom/ClassRepository.h"
+#include "cimom/Value.h"
+
+namespace cimom {
+struct PropertyDeclaration;
+}
 
 namespace cimom::broker {
 
@@ -18,7 +21,7 @@ namespace cimom::broker {
 }
 
 /// The CIM type of a CMPI type without array bit; CMPI_chars is a string.
-/// Nothing for types that are no CIM types.
+/// Nothing for types that are not CIM types.
 [[nodiscard]] std::optional<Type> cimType(CMPIType scalarType) noexcept;
 
 [[nodiscard]] CMPIType cmpiType(Type type) noexcept;

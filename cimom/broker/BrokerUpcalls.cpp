@@ -10,7 +10,8 @@
 #include "broker/objects/BrokerInstance.h"
 #include "broker/objects/BrokerObjectPath.h"
 #include "broker/objects/BrokerStatus.h"
-#include "cimom/ObjectManager.h"
+#include "cimom/ClassRepository.h"
+#include "cimom/Requests.h"
 
 namespace cimom::broker {
 
@@ -59,9 +60,9 @@ std::optional<std::string> textOrNone(const char* text) {
 }
 
 /// Checks what every request to another provider needs, runs it and makes a
-/// CMPIStatus of its status. The request gets manager, schema and path.
-template <typename Result, typename Request>
-CMPIStatus ask(const CMPIBroker* mb, const CMPIObjectPath* op, Result& result, Request&& request) {
+/// CMPIStatus of the status that it gives. The request gets handler and path.
+template <typename Request>
+CMPIStatus ask(const CMPIBroker* mb, const CMPIObjectPath* op, Request&& request) {
     const Broker* const broker = Broker::of(mb);
     const PathRecord* const path = pathOf(op);
     if (broker == nullptr) {
@@ -70,16 +71,15 @@ CMPIStatus ask(const CMPIBroker* mb, const CMPIObjectPath* op, Result& result, R
     if (path == nullptr) {
         return statusOf(CMPI_RC_ERR_INVALID_PARAMETER);
     }
-    if (broker->manager() == nullptr) {
+    if (broker->handler() == nullptr) {
         return statusOf(CMPI_RC_ERR_NOT_SUPPORTED);
     }
     try {
-        result = std::forward<Request>(request)(*broker->manager(), toModel(*path));
+        const Status status = std::forward<Request>(request)(*broker->handler(), toModel(*path));
         CMPIString* const message =
-            result.status.message.empty()
-                ? nullptr
-                : makeString(RequestScope::current().arena(), result.status.message);
-        return {result.status.code, message};
+            status.message.empty() ? nullptr
+                                   : makeString(RequestScope::current().arena(), status.message);
+        return {status.code, message};
     } catch (const std::exception&) {
         return statusOf(CMPI_RC_ERR_FAILED);
     }
@@ -91,41 +91,46 @@ void write(CMPIStatus* rc, const CMPIStatus& status) noexcept {
     }
 }
 
-CMPIData elementOf(Arena& arena, const Schema* schema, const ObjectPath& path) {
+CMPIData elementOf(Arena& arena, const ClassRepository* classes, const ObjectPath& path) {
     CMPIData data{};
     data.type = CMPI_ref;
-    data.value.ref = toRecord(arena, schema, path);
+    data.value.ref = toRecord(arena, classes, path);
     return data;
 }
 
-CMPIData elementOf(Arena& arena, const Schema* schema, const Instance& instance) {
+CMPIData elementOf(Arena& arena, const ClassRepository* classes, const Instance& instance) {
     CMPIData data{};
     data.type = CMPI_instance;
-    data.value.inst = toRecord(arena, schema, instance);
+    data.value.inst = toRecord(arena, classes, instance);
     return data;
 }
 
-/// The delivered items as an enumeration; absent ones are passed over.
-template <typename Item>
-CMPIEnumeration* enumerationFrom(const CMPIBroker* mb, const CMPIStatus& status, CMPIStatus* rc,
-                                 const std::vector<std::optional<Item>>& items) {
+/// The objects of a request as an enumeration; absent ones are passed over. The
+/// request gets handler, path and receiver.
+template <typename Object, typename Request>
+CMPIEnumeration* askObjects(const CMPIBroker* mb, const CMPIObjectPath* op, CMPIStatus* rc,
+                            Request&& request) {
+    CollectedObjects<Object> result;
+    const CMPIStatus status = ask(mb, op, [&](RequestHandler& handler, const ObjectPath& path) {
+        return std::forward<Request>(request)(handler, path, result).status;
+    });
     if (status.rc != CMPI_RC_OK) {
         write(rc, status);
         return nullptr;
     }
     return guarded<CMPIEnumeration*>(rc, nullptr, [&](CMPIrc&) -> CMPIEnumeration* {
         Arena& arena = RequestScope::current().arena();
-        const Schema* const schema = &Broker::of(mb)->schema();
+        const ClassRepository* const classes = &Broker::of(mb)->classes();
         CMPICount count = 0;
-        for (const auto& item : items) {
-            count += item ? 1U : 0U;
+        for (const auto& object : result.objects) {
+            count += object ? 1U : 0U;
         }
-        constexpr bool paths = std::is_same_v<Item, ObjectPath>;
+        constexpr bool paths = std::is_same_v<Object, ObjectPath>;
         ArrayRecord* const array = makeArray(arena, count, paths ? CMPI_ref : CMPI_instance);
         CMPICount index = 0;
-        for (const auto& item : items) {
-            if (item) {
-                array->elements[index] = elementOf(arena, schema, *item);
+        for (const auto& object : result.objects) {
+            if (object) {
+                array->elements[index] = elementOf(arena, classes, *object);
                 ++index;
             }
         }
@@ -135,31 +140,30 @@ CMPIEnumeration* enumerationFrom(const CMPIBroker* mb, const CMPIStatus& status,
 
 CMPIEnumeration* enumerateInstanceNames(const CMPIBroker* mb, const CMPIContext* context,
                                         const CMPIObjectPath* op, CMPIStatus* rc) {
-    PathsResult result;
-    const CMPIStatus status =
-        ask(mb, op, result, [&](ObjectManager& manager, const ObjectPath& path) {
-            return manager.enumerateInstanceNames(path, {std::nullopt, principalOf(context)});
+    return askObjects<ObjectPath>(
+        mb, op, rc, [&](RequestHandler& handler, const ObjectPath& path, auto& receiver) {
+            return handler.enumerateInstanceNames(path, {std::nullopt, principalOf(context)},
+                                                  receiver);
         });
-    return enumerationFrom(mb, status, rc, result.paths);
 }
 
 CMPIEnumeration* enumerateInstances(const CMPIBroker* mb, const CMPIContext* context,
                                     const CMPIObjectPath* op, const char** properties,
                                     CMPIStatus* rc) {
-    InstancesResult result;
-    const CMPIStatus status =
-        ask(mb, op, result, [&](ObjectManager& manager, const ObjectPath& path) {
-            return manager.enumerateInstances(path, {listOf(properties), principalOf(context)});
+    return askObjects<Instance>(
+        mb, op, rc, [&](RequestHandler& handler, const ObjectPath& path, auto& receiver) {
+            return handler.enumerateInstances(path, {listOf(properties), principalOf(context)},
+                                              receiver);
         });
-    return enumerationFrom(mb, status, rc, result.instances);
 }
 
 /// A result without instance is one that was not found.
 CMPIStatus askInstance(const CMPIBroker* mb, const CMPIContext* context, const CMPIObjectPath* op,
                        std::optional<std::vector<std::string>> properties,
                        InstancesResult& result) {
-    CMPIStatus status = ask(mb, op, result, [&](ObjectManager& manager, const ObjectPath& path) {
-        return manager.getInstance(path, {std::move(properties), principalOf(context)});
+    CMPIStatus status = ask(mb, op, [&](RequestHandler& handler, const ObjectPath& path) {
+        result = handler.getInstance(path, {std::move(properties), principalOf(context)});
+        return result.status;
     });
     if (status.rc == CMPI_RC_OK && (result.instances.empty() || !result.instances.front())) {
         status.rc = CMPI_RC_ERR_NOT_FOUND;
@@ -176,7 +180,7 @@ CMPIInstance* getInstance(const CMPIBroker* mb, const CMPIContext* context,
         return nullptr;
     }
     return guarded<CMPIInstance*>(rc, nullptr, [&](CMPIrc&) {
-        return toRecord(RequestScope::current().arena(), &Broker::of(mb)->schema(),
+        return toRecord(RequestScope::current().arena(), &Broker::of(mb)->classes(),
                         *result.instances.front());
     });
 }
@@ -184,7 +188,7 @@ CMPIInstance* getInstance(const CMPIBroker* mb, const CMPIContext* context,
 CMPIData getProperty(const CMPIBroker* mb, const CMPIContext* context, const CMPIObjectPath* op,
                      const char* name, CMPIStatus* rc) {
     if (name == nullptr) {
-        answer(rc, CMPI_RC_ERR_INVALID_PARAMETER);
+        setStatus(rc, CMPI_RC_ERR_INVALID_PARAMETER);
         return missingData();
     }
     InstancesResult result;
@@ -194,20 +198,20 @@ CMPIData getProperty(const CMPIBroker* mb, const CMPIContext* context, const CMP
         return missingData();
     }
     return guarded(rc, missingData(), [&](CMPIrc& code) -> CMPIData {
-        const Schema* const schema = &Broker::of(mb)->schema();
+        const ClassRepository* const classes = &Broker::of(mb)->classes();
         const Instance& instance = *result.instances.front();
         if (const Value* const value = instance.property(name)) {
-            return toData(RequestScope::current().arena(), schema, *value);
+            return toData(RequestScope::current().arena(), classes, *value);
         }
-        const ClassIndex* const index = schema->find(instance.path.className);
+        const ClassDeclaration* const declaration = classes->find(instance.path.className);
         const PropertyDeclaration* const declared =
-            index == nullptr ? nullptr : index->property(name);
+            declaration == nullptr ? nullptr : declaration->property(name);
         if (declared == nullptr) {
             code = CMPI_RC_ERR_NO_SUCH_PROPERTY;
             return {};
         }
         // A property that an instance leaves out is null.
-        return toData(RequestScope::current().arena(), schema,
+        return toData(RequestScope::current().arena(), classes,
                       Value::null(declared->type, declared->isArray));
     });
 }
@@ -219,11 +223,10 @@ CMPIStatus modifyInstance(const CMPIBroker* mb, const CMPIContext* context,
     if (record == nullptr) {
         return statusOf(CMPI_RC_ERR_INVALID_PARAMETER);
     }
-    InstancesResult result;
-    return ask(mb, op, result, [&](ObjectManager& manager, ObjectPath path) {
+    return ask(mb, op, [&](RequestHandler& handler, ObjectPath path) {
         Instance changed = toModel(*record);
         changed.path = std::move(path);
-        return manager.modifyInstance(changed, {listOf(properties), principalOf(context)});
+        return handler.modifyInstance(changed, {listOf(properties), principalOf(context)}).status;
     });
 }
 
@@ -238,51 +241,48 @@ CMPIEnumeration* associators(const CMPIBroker* mb, const CMPIContext* context,
                              const CMPIObjectPath* op, const char* assocClass,
                              const char* resultClass, const char* role, const char* resultRole,
                              const char** properties, CMPIStatus* rc) {
-    InstancesResult result;
-    const CMPIStatus status =
-        ask(mb, op, result, [&](ObjectManager& manager, const ObjectPath& path) {
-            return manager.associators(path, associationRequest(context, assocClass, resultClass,
-                                                                role, resultRole, properties));
+    return askObjects<Instance>(
+        mb, op, rc, [&](RequestHandler& handler, const ObjectPath& path, auto& receiver) {
+            return handler.associators(
+                path,
+                associationRequest(context, assocClass, resultClass, role, resultRole, properties),
+                receiver);
         });
-    return enumerationFrom(mb, status, rc, result.instances);
 }
 
 CMPIEnumeration* associatorNames(const CMPIBroker* mb, const CMPIContext* context,
                                  const CMPIObjectPath* op, const char* assocClass,
                                  const char* resultClass, const char* role, const char* resultRole,
                                  CMPIStatus* rc) {
-    PathsResult result;
-    const CMPIStatus status =
-        ask(mb, op, result, [&](ObjectManager& manager, const ObjectPath& path) {
-            return manager.associatorNames(
+    return askObjects<ObjectPath>(
+        mb, op, rc, [&](RequestHandler& handler, const ObjectPath& path, auto& receiver) {
+            return handler.associatorNames(
                 path,
-                associationRequest(context, assocClass, resultClass, role, resultRole, nullptr));
+                associationRequest(context, assocClass, resultClass, role, resultRole, nullptr),
+                receiver);
         });
-    return enumerationFrom(mb, status, rc, result.paths);
 }
 
 CMPIEnumeration* references(const CMPIBroker* mb, const CMPIContext* context,
                             const CMPIObjectPath* op, const char* resultClass, const char* role,
                             const char** properties, CMPIStatus* rc) {
-    InstancesResult result;
-    const CMPIStatus status =
-        ask(mb, op, result, [&](ObjectManager& manager, const ObjectPath& path) {
-            return manager.references(
-                path, associationRequest(context, nullptr, resultClass, role, nullptr, properties));
+    return askObjects<Instance>(
+        mb, op, rc, [&](RequestHandler& handler, const ObjectPath& path, auto& receiver) {
+            return handler.references(
+                path, associationRequest(context, nullptr, resultClass, role, nullptr, properties),
+                receiver);
         });
-    return enumerationFrom(mb, status, rc, result.instances);
 }
 
 CMPIEnumeration* referenceNames(const CMPIBroker* mb, const CMPIContext* context,
                                 const CMPIObjectPath* op, const char* resultClass, const char* role,
                                 CMPIStatus* rc) {
-    PathsResult result;
-    const CMPIStatus status =
-        ask(mb, op, result, [&](ObjectManager& manager, const ObjectPath& path) {
-            return manager.referenceNames(
-                path, associationRequest(context, nullptr, resultClass, role, nullptr, nullptr));
+    return askObjects<ObjectPath>(
+        mb, op, rc, [&](RequestHandler& handler, const ObjectPath& path, auto& receiver) {
+            return handler.referenceNames(
+                path, associationRequest(context, nullptr, resultClass, role, nullptr, nullptr),
+                receiver);
         });
-    return enumerationFrom(mb, status, rc, result.paths);
 }
 
 // What this host has no meaning for.
@@ -294,7 +294,7 @@ CMPIStatus deliverIndication(const CMPIBroker*, const CMPIContext*, const char*,
 
 CMPIObjectPath* createInstance(const CMPIBroker*, const CMPIContext*, const CMPIObjectPath*,
                                const CMPIInstance*, CMPIStatus* rc) {
-    answer(rc, CMPI_RC_ERR_NOT_SUPPORTED);
+    setStatus(rc, CMPI_RC_ERR_NOT_SUPPORTED);
     return nullptr;
 }
 
@@ -304,13 +304,13 @@ CMPIStatus deleteInstance(const CMPIBroker*, const CMPIContext*, const CMPIObjec
 
 CMPIEnumeration* execQuery(const CMPIBroker*, const CMPIContext*, const CMPIObjectPath*,
                            const char*, const char*, CMPIStatus* rc) {
-    answer(rc, CMPI_RC_ERR_NOT_SUPPORTED);
+    setStatus(rc, CMPI_RC_ERR_NOT_SUPPORTED);
     return nullptr;
 }
 
 CMPIData invokeMethod(const CMPIBroker*, const CMPIContext*, const CMPIObjectPath*, const char*,
                       const CMPIArgs*, CMPIArgs*, CMPIStatus* rc) {
-    answer(rc, CMPI_RC_ERR_NOT_SUPPORTED);
+    setStatus(rc, CMPI_RC_ERR_NOT_SUPPORTED);
     return badData();
 }
 

@@ -56,7 +56,7 @@ Scalar scalarOf(const CMPIData& data) {
 }
 
 [[noreturn]] void refuse(const std::string& what, Type type) {
-    throw ConversionError(what + " is no " + std::string(typeName(type)));
+    throw ConversionError(what + " is not of type " + std::string(typeName(type)));
 }
 
 template <typename Target>
@@ -113,7 +113,7 @@ CMPIDateTime* dateTime(Arena& arena, const std::string& text) {
     return record;
 }
 
-CMPIData scalarData(Arena& arena, const Schema* schema, Type type, const Scalar& scalar) {
+CMPIData scalarData(Arena& arena, const ClassRepository* classes, Type type, const Scalar& scalar) {
     CMPIData data = nullData(cmpiType(type));
     if (std::holds_alternative<std::monostate>(scalar)) {
         return data;
@@ -161,7 +161,7 @@ CMPIData scalarData(Arena& arena, const Schema* schema, Type type, const Scalar&
             // An embedded instance may stand in a text property.
             if (const auto* instance = std::get_if<std::shared_ptr<const Instance>>(&scalar)) {
                 data.type = CMPI_instance;
-                value.inst = toRecord(arena, schema, **instance);
+                value.inst = toRecord(arena, classes, **instance);
             } else {
                 value.string = makeString(arena, held<std::string>(scalar, type));
             }
@@ -171,19 +171,19 @@ CMPIData scalarData(Arena& arena, const Schema* schema, Type type, const Scalar&
             break;
         case Type::reference:
             value.ref =
-                toRecord(arena, schema, *held<std::shared_ptr<const ObjectPath>>(scalar, type));
+                toRecord(arena, classes, *held<std::shared_ptr<const ObjectPath>>(scalar, type));
             break;
         case Type::instance:
             value.inst =
-                toRecord(arena, schema, *held<std::shared_ptr<const Instance>>(scalar, type));
+                toRecord(arena, classes, *held<std::shared_ptr<const Instance>>(scalar, type));
             break;
     }
     return data;
 }
 
-CMPIData namedData(Arena& arena, const Schema* schema, const NamedValue& named) {
+CMPIData namedData(Arena& arena, const ClassRepository* classes, const NamedValue& named) {
     try {
-        return toData(arena, schema, named.value);
+        return toData(arena, classes, named.value);
     } catch (const ConversionError& error) {
         throw ConversionError(named.name + ": " + error.what());
     }
@@ -228,12 +228,12 @@ Instance toModel(const InstanceRecord& instance) {
     return {toModel(*instance.path), toModel(instance.properties)};
 }
 
-CMPIData toData(Arena& arena, const Schema* schema, const Value& value) {
+CMPIData toData(Arena& arena, const ClassRepository* classes, const Value& value) {
     if (value.isNull()) {
         return nullData(cmpiType(value.type, value.isArray));
     }
     if (const Scalar* const scalar = value.scalar()) {
-        return scalarData(arena, schema, value.type, *scalar);
+        return scalarData(arena, classes, value.type, *scalar);
     }
     const auto& elements = std::get<Array>(value.content);
     if (elements.size() > std::numeric_limits<CMPICount>::max()) {
@@ -244,14 +244,14 @@ CMPIData toData(Arena& arena, const Schema* schema, const Value& value) {
     ArrayRecord* const array =
         makeArray(arena, static_cast<CMPICount>(elements.size()), cmpiType(value.type));
     for (CMPICount index = 0; index < array->size; ++index) {
-        array->elements[index] = scalarData(arena, schema, value.type, elements[index]);
+        array->elements[index] = scalarData(arena, classes, value.type, elements[index]);
     }
     data.value.array = array;
     return data;
 }
 
-PathRecord* toRecord(Arena& arena, const Schema* schema, const ObjectPath& path) {
-    PathRecord* const record = makePath(arena, schema, path.nameSpace, path.className);
+PathRecord* toRecord(Arena& arena, const ClassRepository* classes, const ObjectPath& path) {
+    PathRecord* const record = makePath(arena, classes, path.nameSpace, path.className);
     if (!path.host.empty()) {
         record->host = makeString(arena, path.host);
     }
@@ -259,16 +259,16 @@ PathRecord* toRecord(Arena& arena, const Schema* schema, const ObjectPath& path)
     for (const NamedValue& key : path.keys) {
         // Keys cannot be null; a path with a null key is one without it.
         if (!key.value.isNull()) {
-            record->keys.set(arena, key.name, namedData(arena, schema, key));
+            record->keys.set(arena, key.name, namedData(arena, classes, key));
         }
     }
     return record;
 }
 
-InstanceRecord* toRecord(Arena& arena, const Schema* schema, const Instance& instance) {
-    InstanceRecord* const record = makeInstance(arena, *toRecord(arena, schema, instance.path));
+InstanceRecord* toRecord(Arena& arena, const ClassRepository* classes, const Instance& instance) {
+    InstanceRecord* const record = makeInstance(arena, *toRecord(arena, classes, instance.path));
     for (const NamedValue& property : instance.properties) {
-        record->properties.set(arena, property.name, namedData(arena, schema, property));
+        record->properties.set(arena, property.name, namedData(arena, classes, property));
     }
     return record;
 }

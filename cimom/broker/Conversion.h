@@ -6,12 +6,12 @@
 
 #include "broker/objects/BrokerInstance.h"
 #include "broker/objects/BrokerObjectPath.h"
-#include "cimom/Cim.h"
+#include "cimom/Instance.h"
 
 namespace cimom::broker {
 
 /// A value of the model that its type cannot hold, e.g. 300 for a uint8 or a
-/// text that is no datetime. what() tells name, value and type.
+/// text that is not a datetime. what() tells name, value and type.
 class ConversionError : public std::invalid_argument {
   public:
     using std::invalid_argument::invalid_argument;
@@ -25,9 +25,10 @@ class ConversionError : public std::invalid_argument {
 
 // From the model to objects in an arena. Values are not compared with the class:
 // a provider gets what the client sent. Throw ConversionError, std::bad_alloc.
-[[nodiscard]] CMPIData toData(Arena& arena, const Schema* schema, const Value& value);
-[[nodiscard]] PathRecord* toRecord(Arena& arena, const Schema* schema, const ObjectPath& path);
-[[nodiscard]] InstanceRecord* toRecord(Arena& arena, const Schema* schema,
+[[nodiscard]] CMPIData toData(Arena& arena, const ClassRepository* classes, const Value& value);
+[[nodiscard]] PathRecord* toRecord(Arena& arena, const ClassRepository* classes,
+                                   const ObjectPath& path);
+[[nodiscard]] InstanceRecord* toRecord(Arena& arena, const ClassRepository* classes,
                                        const Instance& instance);
 
 }  // namespace cimom::broker

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <string_view>
 
+#include "cimom/Names.h"
 #include "manager/PathMatch.h"
 
 namespace cimom {

@@ -4,8 +4,8 @@
 #include <string>
 #include <vector>
 
-#include "cimom/Cim.h"
 #include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
 
 namespace cimom {
 

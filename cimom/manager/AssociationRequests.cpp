@@ -41,11 +41,9 @@ std::vector<Provider*> ObjectManager::Implementation::associationProviders(
 }
 
 template <typename Slot, typename Invoke>
-CallOutcome ObjectManager::Implementation::callAssociation(Provider& provider,
-                                                           Slot CMPIAssociationMIFT::*slot,
-                                                           const char* name, const ObjectPath& path,
-                                                           const std::string& principal,
-                                                           const Sink& sink, Invoke&& invoke) {
+CallOutcome ObjectManager::Implementation::callAssociation(
+    Provider& provider, Slot CMPIAssociationMIFT::*slot, const char* name, const ObjectPath& path,
+    const std::string& principal, const AnyReceiver& receiver, Invoke&& invoke) {
     Status status;
     CMPIAssociationMI* const mi = provider.association(path.nameSpace, status);
     if (mi == nullptr) {
@@ -55,8 +53,9 @@ CallOutcome ObjectManager::Implementation::callAssociation(Provider& provider,
     if (function == nullptr) {
         return missingSlot(provider.name(), name);
     }
-    return callProvider(settings(principal, 0), sink, "provider " + provider.name() + ": " + name,
-                        path, [&](const auto* context, const auto* result, const auto* op) {
+    return callProvider(settings(principal, 0), receiver,
+                        "provider " + provider.name() + ": " + name, path,
+                        [&](const auto* context, const auto* result, const auto* op) {
                             return invoke(function, mi, context, result, op);
                         });
 }
@@ -64,10 +63,10 @@ CallOutcome ObjectManager::Implementation::callAssociation(Provider& provider,
 CallOutcome ObjectManager::Implementation::callAssociators(Provider& provider,
                                                            const ObjectPath& path,
                                                            const AssociationRequest& request,
-                                                           const Sink& sink) {
+                                                           const AnyReceiver& receiver) {
     const auto call = [&](auto slot, const char* name, auto... further) {
         return callAssociation(
-            provider, slot, name, path, request.principal, sink,
+            provider, slot, name, path, request.principal, receiver,
             [&](auto function, auto* mi, const auto* context, const auto* result, const auto* op) {
                 return function(mi, context, result, op, pointer(request.assocClass),
                                 pointer(request.resultClass), pointer(request.role),
@@ -75,7 +74,7 @@ CallOutcome ObjectManager::Implementation::callAssociators(Provider& provider,
             });
     };
     PropertyNames names(request.propertyList);
-    return sink.kind == Kind::paths
+    return broker::wantsPaths(receiver)
                ? call(&CMPIAssociationMIFT::associatorNames, "associatorNames")
                : call(&CMPIAssociationMIFT::associators, "associators", names.pointer());
 }
@@ -84,24 +83,24 @@ CallOutcome ObjectManager::Implementation::callReferences(Provider& provider,
                                                           const ObjectPath& path,
                                                           const std::string& resultClass,
                                                           const AssociationRequest& request,
-                                                          const Sink& sink) {
+                                                          const AnyReceiver& receiver) {
     const auto call = [&](auto slot, const char* name, auto... further) {
         return callAssociation(
-            provider, slot, name, path, request.principal, sink,
+            provider, slot, name, path, request.principal, receiver,
             [&](auto function, auto* mi, const auto* context, const auto* result, const auto* op) {
                 return function(mi, context, result, op, resultClass.c_str(), pointer(request.role),
                                 further...);
             });
     };
     PropertyNames names(request.propertyList);
-    return sink.kind == Kind::paths
+    return broker::wantsPaths(receiver)
                ? call(&CMPIAssociationMIFT::referenceNames, "referenceNames")
                : call(&CMPIAssociationMIFT::references, "references", names.pointer());
 }
 
 /// Every association provider is asked once, for all of its associations.
 ObjectManager::Implementation::Outcomes ObjectManager::Implementation::askAssociators(
-    const ObjectPath& path, const AssociationRequest& request, const Sink& sink) {
+    const ObjectPath& path, const AssociationRequest& request, const AnyReceiver& receiver) {
     AssociationRequest passed = request;
     if (passed.assocClass) {
         passed.assocClass = canonicalClass(*passed.assocClass);
@@ -116,16 +115,16 @@ ObjectManager::Implementation::Outcomes ObjectManager::Implementation::askAssoci
     Outcomes outcomes;
     const std::vector<Provider*> providers = associationProviders(path.nameSpace);
     for (Provider* const provider : providers) {
-        outcomes.calls.push_back(callAssociators(*provider, path, passed, sink));
+        outcomes.calls.push_back(callAssociators(*provider, path, passed, receiver));
     }
-    // Of several providers, those that answered count; what all of them refuse is refused.
-    const auto answered = [](const CallOutcome& call) {
+    // Of several providers, those that have a result count; what all of them refuse is refused.
+    const auto hasResult = [](const CallOutcome& call) {
         return call.status.code != CMPI_RC_ERR_INVALID_CLASS &&
                call.status.code != CMPI_RC_ERR_NOT_SUPPORTED &&
                call.status.code != CMPI_RC_ERR_NOT_FOUND;
     };
     if (!outcomes.calls.empty() &&
-        std::none_of(outcomes.calls.begin(), outcomes.calls.end(), answered)) {
+        std::none_of(outcomes.calls.begin(), outcomes.calls.end(), hasResult)) {
         outcomes.calls.resize(1);
         outcomes.exact = true;
     }
@@ -134,13 +133,13 @@ ObjectManager::Implementation::Outcomes ObjectManager::Implementation::askAssoci
 
 /// Providers know their association classes by their exact names.
 ObjectManager::Implementation::Outcomes ObjectManager::Implementation::askReferences(
-    const ObjectPath& path, const AssociationRequest& request, const Sink& sink) {
+    const ObjectPath& path, const AssociationRequest& request, const AnyReceiver& receiver) {
     Outcomes outcomes;
     if (request.resultClass && repository_.find(*request.resultClass) == nullptr) {
         // Unknown here; the providers say what that means.
         for (Provider* const provider : associationProviders(path.nameSpace)) {
             outcomes.calls.push_back(
-                callReferences(*provider, path, *request.resultClass, request, sink));
+                callReferences(*provider, path, *request.resultClass, request, receiver));
         }
         outcomes.exact = outcomes.calls.size() == 1;
         return outcomes;
@@ -165,7 +164,7 @@ ObjectManager::Implementation::Outcomes ObjectManager::Implementation::askRefere
                      sameName(targets.front()->declaration->name, *request.resultClass);
     for (const ServedClass* const target : targets) {
         outcomes.calls.push_back(
-            callReferences(*target->provider, path, target->declaration->name, request, sink));
+            callReferences(*target->provider, path, target->declaration->name, request, receiver));
     }
     return outcomes;
 }
@@ -175,9 +174,9 @@ std::optional<std::vector<Instance>> ObjectManager::Implementation::associations
     AssociationRequest wanted;
     wanted.resultClass = request.assocClass;
     wanted.principal = request.principal;
-    Collection<Instance> collection;
-    const Outcomes outcomes =
-        askReferences(path, wanted, sinkTo(collection, path.nameSpace, std::nullopt, everything));
+    CollectedObjects<Instance> collection;
+    RequestedObjects<Instance> requested(collection, surroundings(path), wanted.propertyList);
+    const Outcomes outcomes = askReferences(path, wanted, &requested);
     const auto unsupported = [](const CallOutcome& call) {
         return call.status.code == CMPI_RC_ERR_NOT_SUPPORTED;
     };
@@ -200,26 +199,28 @@ std::optional<std::vector<Instance>> ObjectManager::Implementation::associations
 template <typename Object>
 RequestEnd ObjectManager::Implementation::associated(ObjectPath path,
                                                      const AssociationRequest& request,
-                                                     Receiver<Object>& receiver) {
+                                                     ResultReceiver<Object>& receiver) {
     const auto isWanted = [&](const Object& object) {
         return isOfClass(pathOf(object).className, request.resultClass, repository_);
     };
     if (!request.role && !request.resultRole) {
         return run(path, [&] {
-            return askAssociators(path, request,
-                                  sinkTo(receiver, path.nameSpace, request.propertyList, isWanted));
+            RequestedObjects<Object> requested(receiver, surroundings(path), request.propertyList,
+                                               isWanted);
+            return askAssociators(path, request, &requested);
         });
     }
     return run(path, [&] {
-        Collection<Object> collection;
-        Outcomes outcomes = askAssociators(
-            path, request, sinkTo(collection, path.nameSpace, request.propertyList, isWanted));
+        CollectedObjects<Object> collection;
+        RequestedObjects<Object> requested(collection, surroundings(path), request.propertyList,
+                                           isWanted);
+        Outcomes outcomes = askAssociators(path, request, &requested);
         if (collection.objects.empty() || !endOf(outcomes.calls, outcomes.exact).status.ok()) {
             return outcomes;
         }
         // The roles are known by further requests, which have to wait until the
-        // provider has returned: it may hold a lock while it delivers. Without anyone
-        // who could tell, its own answer counts.
+        // provider has returned: it may hold a lock while it hands objects over. When no
+        // provider can tell them, all of the result counts.
         const auto known = associationsOf(path, request);
         for (auto& object : collection.objects) {
             if (!object || !known ||
@@ -235,38 +236,39 @@ RequestEnd ObjectManager::Implementation::associated(ObjectPath path,
 template <typename Object>
 RequestEnd ObjectManager::Implementation::referring(ObjectPath path,
                                                     const AssociationRequest& request,
-                                                    Receiver<Object>& receiver) {
+                                                    ResultReceiver<Object>& receiver) {
     return run(path, [&] {
         const auto isWanted = [&](const Object& object) {
             return isOfClass(pathOf(object).className, request.resultClass, repository_) &&
                    playsRole(asInstance(object), path, request.role, repository_);
         };
-        return askReferences(path, request,
-                             sinkTo(receiver, path.nameSpace, request.propertyList, isWanted));
+        RequestedObjects<Object> requested(receiver, surroundings(path), request.propertyList,
+                                           isWanted);
+        return askReferences(path, request, &requested);
     });
 }
 
 RequestEnd ObjectManager::Implementation::associatorNames(ObjectPath path,
                                                           const AssociationRequest& request,
-                                                          Receiver<ObjectPath>& receiver) {
+                                                          ResultReceiver<ObjectPath>& receiver) {
     return associated(std::move(path), request, receiver);
 }
 
 RequestEnd ObjectManager::Implementation::associators(ObjectPath path,
                                                       const AssociationRequest& request,
-                                                      Receiver<Instance>& receiver) {
+                                                      ResultReceiver<Instance>& receiver) {
     return associated(std::move(path), request, receiver);
 }
 
 RequestEnd ObjectManager::Implementation::referenceNames(ObjectPath path,
                                                          const AssociationRequest& request,
-                                                         Receiver<ObjectPath>& receiver) {
+                                                         ResultReceiver<ObjectPath>& receiver) {
     return referring(std::move(path), request, receiver);
 }
 
 RequestEnd ObjectManager::Implementation::references(ObjectPath path,
                                                      const AssociationRequest& request,
-                                                     Receiver<Instance>& receiver) {
+                                                     ResultReceiver<Instance>& receiver) {
     return referring(std::move(path), request, receiver);
 }
 

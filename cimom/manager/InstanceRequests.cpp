@@ -10,20 +10,17 @@ namespace cimom {
 namespace {
 
 /// Keeps the first instance that agrees with every key of a path, of however many.
-class FirstMatch final : public Receiver<Instance> {
+/// For one call.
+class FirstMatch final : public ResultReceiver<Instance> {
   public:
     explicit FirstMatch(const ObjectPath& wanted) : wanted_(wanted) {}
+    void beginCall() override {}
     void take(std::optional<Instance> instance) override {
         if (!found && instance && hasKeys(*instance, wanted_)) {
             found = std::move(instance);
         }
     }
-    [[nodiscard]] std::size_t mark() override { return found ? 1 : 0; }
-    void backTo(std::size_t mark) override {
-        if (mark == 0) {
-            found.reset();
-        }
-    }
+    void dropCall() override { found.reset(); }
 
     std::optional<Instance> found;
 
@@ -31,20 +28,20 @@ class FirstMatch final : public Receiver<Instance> {
     const ObjectPath& wanted_;
 };
 
-/// For calls that have no result, whatever the provider delivers.
-Sink nowhere() {
-    return {broker::ResultCollector::Kind::instances,
-            {nullptr, [](const std::optional<Instance>&) {}},
-            [] { return std::size_t{0}; },
-            [](std::size_t) {}};
-}
+/// For calls that have no result, whatever the provider hands over.
+class NoObjects final : public ResultReceiver<Instance> {
+  public:
+    void beginCall() override {}
+    void take(std::optional<Instance> /*instance*/) override {}
+    void dropCall() override {}
+};
 
 }  // namespace
 
 CallOutcome ObjectManager::Implementation::callReading(const ServedClass& target, Reading reading,
                                                        ObjectPath path,
                                                        const InstanceRequest& request,
-                                                       const Sink& sink) {
+                                                       const AnyReceiver& receiver) {
     Status status;
     CMPIInstanceMI* const mi = target.provider->instance(path.nameSpace, status);
     if (mi == nullptr) {
@@ -58,8 +55,9 @@ CallOutcome ObjectManager::Implementation::callReading(const ServedClass& target
         if (table.enumerateInstanceNames == nullptr) {
             return missingSlot(target.provider->name(), "enumerateInstanceNames");
         }
-        return callProvider(settings(request.principal, 0), sink, who + "enumerateInstanceNames",
-                            path, [&](const auto* context, const auto* result, const auto* op) {
+        return callProvider(settings(request.principal, 0), receiver,
+                            who + "enumerateInstanceNames", path,
+                            [&](const auto* context, const auto* result, const auto* op) {
                                 return table.enumerateInstanceNames(mi, context, result, op);
                             });
     }
@@ -71,7 +69,7 @@ CallOutcome ObjectManager::Implementation::callReading(const ServedClass& target
     }
     PropertyNames names(request.propertyList);
     const CMPIFlags flags = one ? 0 : CMPI_FLAG_DeepInheritance;
-    return callProvider(settings(request.principal, flags), sink, who + slot, path,
+    return callProvider(settings(request.principal, flags), receiver, who + slot, path,
                         [&](const auto* context, const auto* result, const auto* op) {
                             return function(mi, context, result, op, names.pointer());
                         });
@@ -92,8 +90,9 @@ CallOutcome ObjectManager::Implementation::callModify(const ServedClass& target,
     PropertyNames names(request.propertyList);
     // In memory of its own: that of the call begins and ends with the call.
     broker::Arena arena;
-    const CMPIInstance* const changed = broker::toRecord(arena, &*schema_, instance);
-    return callProvider(settings(request.principal, 0), nowhere(),
+    const CMPIInstance* const changed = broker::toRecord(arena, &repository_, instance);
+    NoObjects nowhere;
+    return callProvider(settings(request.principal, 0), &nowhere,
                         "provider " + target.provider->name() + ": modifyInstance", instance.path,
                         [&](const auto* context, const auto* result, const auto* op) {
                             return function(mi, context, result, op, changed, names.pointer());
@@ -101,32 +100,32 @@ CallOutcome ObjectManager::Implementation::callModify(const ServedClass& target,
 }
 
 ObjectManager::Implementation::Outcomes ObjectManager::Implementation::enumerate(
-    Reading reading, const ObjectPath& path, const InstanceRequest& request, const Sink& sink) {
+    Reading reading, const ObjectPath& path, const InstanceRequest& request,
+    const AnyReceiver& receiver) {
     Outcomes outcomes;
     const ServedClasses targets = servedInstances(path.className, path.nameSpace);
     outcomes.exact =
         targets.size() == 1 && sameName(targets.front()->declaration->name, path.className);
     for (const ServedClass* const target : targets) {
-        outcomes.calls.push_back(callReading(*target, reading, path, request, sink));
+        outcomes.calls.push_back(callReading(*target, reading, path, request, receiver));
     }
     return outcomes;
 }
 
-RequestEnd ObjectManager::Implementation::enumerateInstanceNames(ObjectPath path,
-                                                                 const InstanceRequest& request,
-                                                                 Receiver<ObjectPath>& receiver) {
+RequestEnd ObjectManager::Implementation::enumerateInstanceNames(
+    ObjectPath path, const InstanceRequest& request, ResultReceiver<ObjectPath>& receiver) {
     return run(path, [&] {
-        return enumerate(Reading::names, path, request,
-                         sinkTo(receiver, path.nameSpace, std::nullopt, everything));
+        RequestedObjects<ObjectPath> requested(receiver, surroundings(path), request.propertyList);
+        return enumerate(Reading::names, path, request, &requested);
     });
 }
 
 RequestEnd ObjectManager::Implementation::enumerateInstances(ObjectPath path,
                                                              const InstanceRequest& request,
-                                                             Receiver<Instance>& receiver) {
+                                                             ResultReceiver<Instance>& receiver) {
     return run(path, [&] {
-        return enumerate(Reading::instances, path, request,
-                         sinkTo(receiver, path.nameSpace, request.propertyList, everything));
+        RequestedObjects<Instance> requested(receiver, surroundings(path), request.propertyList);
+        return enumerate(Reading::instances, path, request, &requested);
     });
 }
 
@@ -136,8 +135,8 @@ InstancesResult ObjectManager::Implementation::getFrom(const ServedClass& target
     FirstMatch match(path);
     // Keys may be among the properties that the client does not want to see.
     const std::optional<std::vector<std::string>> allProperties;
-    const Sink sink = sinkTo(match, path.nameSpace, allProperties, everything);
-    RequestEnd end = endOf({callReading(target, Reading::one, path, request, sink)},
+    RequestedObjects<Instance> requested(match, surroundings(path), allProperties);
+    RequestEnd end = endOf({callReading(target, Reading::one, path, request, &requested)},
                            sameName(target.declaration->name, path.className));
     InstancesResult result{std::move(end.status), {}, end.returnDoneCalls};
     if (!result.status.ok()) {
@@ -155,27 +154,27 @@ InstancesResult ObjectManager::Implementation::getFrom(const ServedClass& target
 InstancesResult ObjectManager::Implementation::getInstance(ObjectPath path,
                                                            const InstanceRequest& request) {
     try {
-        InstancesResult answer;
-        answer.status = canonical(path);
-        if (!answer.status.ok()) {
-            return answer;
+        InstancesResult whole;
+        whole.status = canonical(path);
+        if (!whole.status.ok()) {
+            return whole;
         }
-        answer.status = {CMPI_RC_ERR_NOT_FOUND, ""};
+        whole.status = {CMPI_RC_ERR_NOT_FOUND, ""};
         for (const ServedClass* const target : servedInstances(path.className, path.nameSpace)) {
             InstancesResult result = getFrom(*target, path, request);
-            result.returnDoneCalls += answer.returnDoneCalls;
+            result.returnDoneCalls += whole.returnDoneCalls;
             // After an error, another class may still have the instance; the first
             // error that tells more than that nothing was found is kept.
-            if (result.status.ok() || answer.status.code == CMPI_RC_ERR_NOT_FOUND) {
-                answer = std::move(result);
+            if (result.status.ok() || whole.status.code == CMPI_RC_ERR_NOT_FOUND) {
+                whole = std::move(result);
             } else {
-                answer.returnDoneCalls = result.returnDoneCalls;
+                whole.returnDoneCalls = result.returnDoneCalls;
             }
-            if (answer.status.ok()) {
+            if (whole.status.ok()) {
                 break;
             }
         }
-        return answer;
+        return whole;
     } catch (const broker::ConversionError& error) {
         return {{CMPI_RC_ERR_INVALID_PARAMETER, error.what()}, {}, 0};
     }
@@ -184,13 +183,13 @@ InstancesResult ObjectManager::Implementation::getInstance(ObjectPath path,
 InstancesResult ObjectManager::Implementation::modifyInstance(Instance instance,
                                                               const InstanceRequest& request) {
     try {
-        InstancesResult answer;
-        answer.status = canonical(instance.path);
-        if (answer.status.ok()) {
-            answer.status = checkTexts(instance);
+        InstancesResult whole;
+        whole.status = canonical(instance.path);
+        if (whole.status.ok()) {
+            whole.status = checkTexts(instance);
         }
-        if (!answer.status.ok()) {
-            return answer;
+        if (!whole.status.ok()) {
+            return whole;
         }
         const ObjectPath wanted = instance.path;
         for (const ServedClass* const target :
@@ -204,12 +203,12 @@ InstancesResult ObjectManager::Implementation::modifyInstance(Instance instance,
             }
             instance.path.className = className;
             const CallOutcome outcome = callModify(*target, instance, request);
-            answer.status = outcome.status;
-            answer.returnDoneCalls = outcome.returnDoneCalls;
-            return answer;
+            whole.status = outcome.status;
+            whole.returnDoneCalls = outcome.returnDoneCalls;
+            return whole;
         }
-        answer.status = {CMPI_RC_ERR_NOT_FOUND, ""};
-        return answer;
+        whole.status = {CMPI_RC_ERR_NOT_FOUND, ""};
+        return whole;
     } catch (const broker::ConversionError& error) {
         return {{CMPI_RC_ERR_INVALID_PARAMETER, error.what()}, {}, 0};
     }

@@ -15,7 +15,7 @@ namespace {
 
 std::string machineName() {
     std::array<char, 256> name{};
-    // A machine without a readable name still needs one in its answers.
+    // The paths of a machine without a readable name need a host, too.
     if (gethostname(name.data(), name.size() - 1) != 0 || name.front() == '\0') {
         return "localhost";
     }
@@ -42,8 +42,7 @@ ObjectManager::Implementation::Implementation(ObjectManager& manager, Configurat
         auto read = readRegistrations(file);
         std::move(read.begin(), read.end(), std::back_inserter(registrations_));
     }
-    schema_.emplace(repository_);
-    providers_.emplace(configuration_.providerDirectories, *schema_, &manager);
+    providers_.emplace(configuration_.providerDirectories, repository_, &manager);
     served_.reserve(registrations_.size());
     for (const Registration& registration : registrations_) {
         serve(registration);
@@ -123,7 +122,7 @@ ObjectManager::Implementation::ServedClasses ObjectManager::Implementation::serv
 
 CallSettings ObjectManager::Implementation::settings(const std::string& principal,
                                                      CMPIFlags flags) const {
-    return {&*schema_, principal, flags};
+    return {&repository_, principal, flags};
 }
 
 ObjectManager::ObjectManager(Configuration configuration)
@@ -152,7 +151,7 @@ namespace {
 /// The result of a request that `ask` carries out with a receiver.
 template <typename Result, typename Object, typename Ask>
 Result collected(Ask&& ask) {
-    Collection<Object> collection;
+    CollectedObjects<Object> collection;
     RequestEnd end = std::forward<Ask>(ask)(collection);
     if (!end.status.ok()) {
         collection.objects.clear();
@@ -170,7 +169,7 @@ PathsResult ObjectManager::enumerateInstanceNames(const ObjectPath& path,
 
 RequestEnd ObjectManager::enumerateInstanceNames(const ObjectPath& path,
                                                  const InstanceRequest& request,
-                                                 Receiver<ObjectPath>& receiver) {
+                                                 ResultReceiver<ObjectPath>& receiver) {
     return implementation_->enumerateInstanceNames(path, request, receiver);
 }
 
@@ -181,7 +180,7 @@ InstancesResult ObjectManager::enumerateInstances(const ObjectPath& path,
 }
 
 RequestEnd ObjectManager::enumerateInstances(const ObjectPath& path, const InstanceRequest& request,
-                                             Receiver<Instance>& receiver) {
+                                             ResultReceiver<Instance>& receiver) {
     return implementation_->enumerateInstances(path, request, receiver);
 }
 
@@ -192,7 +191,7 @@ PathsResult ObjectManager::associatorNames(const ObjectPath& path,
 }
 
 RequestEnd ObjectManager::associatorNames(const ObjectPath& path, const AssociationRequest& request,
-                                          Receiver<ObjectPath>& receiver) {
+                                          ResultReceiver<ObjectPath>& receiver) {
     return implementation_->associatorNames(path, request, receiver);
 }
 
@@ -203,7 +202,7 @@ InstancesResult ObjectManager::associators(const ObjectPath& path,
 }
 
 RequestEnd ObjectManager::associators(const ObjectPath& path, const AssociationRequest& request,
-                                      Receiver<Instance>& receiver) {
+                                      ResultReceiver<Instance>& receiver) {
     return implementation_->associators(path, request, receiver);
 }
 
@@ -214,7 +213,7 @@ PathsResult ObjectManager::referenceNames(const ObjectPath& path,
 }
 
 RequestEnd ObjectManager::referenceNames(const ObjectPath& path, const AssociationRequest& request,
-                                         Receiver<ObjectPath>& receiver) {
+                                         ResultReceiver<ObjectPath>& receiver) {
     return implementation_->referenceNames(path, request, receiver);
 }
 
@@ -225,7 +224,7 @@ InstancesResult ObjectManager::references(const ObjectPath& path,
 }
 
 RequestEnd ObjectManager::references(const ObjectPath& path, const AssociationRequest& request,
-                                     Receiver<Instance>& receiver) {
+                                     ResultReceiver<Instance>& receiver) {
     return implementation_->references(path, request, receiver);
 }
 

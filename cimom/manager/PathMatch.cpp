@@ -4,6 +4,8 @@
 #include <optional>
 #include <utility>
 
+#include "cimom/Names.h"
+
 namespace cimom {
 
 namespace {

@@ -2,8 +2,8 @@
 
 #include <string_view>
 
-#include "cimom/Cim.h"
 #include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
 
 namespace cimom {
 

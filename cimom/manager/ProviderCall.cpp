@@ -6,6 +6,24 @@
 
 namespace cimom {
 
+namespace {
+
+/// The status of the whole. A call that stands for one of several classes adds
+/// nothing when the provider does not know the class or the operation.
+Status overall(const std::vector<CallOutcome>& calls, bool exact) {
+    for (const CallOutcome& call : calls) {
+        const bool nothingToAdd = !exact && (call.status.code == CMPI_RC_ERR_INVALID_CLASS ||
+                                             call.status.code == CMPI_RC_ERR_NOT_SUPPORTED ||
+                                             call.status.code == CMPI_RC_ERR_NOT_FOUND);
+        if (!call.status.ok() && !nothingToAdd) {
+            return call.status;
+        }
+    }
+    return {};
+}
+
+}  // namespace
+
 Status statusFrom(const CMPIStatus& status) {
     // The provider may have put any number there, which the enumeration cannot hold.
     int code = 0;
@@ -69,20 +87,30 @@ CallOutcome missingSlot(const std::string& provider, const char* slot) {
     return {{CMPI_RC_ERR_NOT_SUPPORTED, "provider " + provider + " does not offer " + slot}};
 }
 
-CallOutcome finished(Status status, broker::ResultCollector& collector, const Sink& sink,
-                     std::size_t mark) {
-    if (const std::exception_ptr failure = collector.failure()) {
+RequestEnd endOf(const std::vector<CallOutcome>& calls, bool exact) {
+    RequestEnd end{overall(calls, exact)};
+    for (const CallOutcome& call : calls) {
+        end.returnDoneCalls += call.returnDoneCalls;
+    }
+    return end;
+}
+
+void beginCall(const broker::AnyReceiver& receiver) {
+    std::visit([](auto* each) { each->beginCall(); }, receiver);
+}
+
+CallOutcome finished(Status status, const broker::BrokerResult& result,
+                     const broker::AnyReceiver& receiver) {
+    if (const std::exception_ptr failure = result.failure()) {
         std::rethrow_exception(failure);
     }
-    broker::Delivery delivery = collector.take();
     if (!status.ok()) {
         if (status.message.empty()) {
-            status.message = std::move(delivery.errorMessage);
+            status.message = result.errorMessage();
         }
-        // What came before an error is no answer.
-        sink.backTo(mark);
+        std::visit([](auto* each) { each->dropCall(); }, receiver);
     }
-    return {std::move(status), delivery.returnDoneCalls};
+    return {std::move(status), result.returnDoneCalls()};
 }
 
 }  // namespace cimom

@@ -3,9 +3,7 @@
 #include <cmpift.h>
 #include <cxxabi.h>
 
-#include <cstddef>
 #include <exception>
-#include <functional>
 #include <optional>
 #include <string>
 #include <utility>
@@ -16,10 +14,11 @@
 #include "broker/RequestScope.h"
 #include "broker/objects/BrokerContext.h"
 #include "broker/objects/BrokerResult.h"
-#include "cimom/Cim.h"
-#include "mof/Schema.h"
+#include "cimom/Requests.h"
 
 namespace cimom {
+
+class ClassRepository;
 
 /// The model of a provider's status; reads it while the message still lives.
 [[nodiscard]] Status statusFrom(const CMPIStatus& status);
@@ -51,23 +50,15 @@ class PropertyNames {
     std::vector<const char*> pointers_;
 };
 
-/// Where the objects of a request's calls go.
-struct Sink {
-    broker::ResultCollector::Kind kind = broker::ResultCollector::Kind::instances;
-    broker::Consumer consumer;
-    std::function<std::size_t()> mark;
-    std::function<void(std::size_t)> backTo;  ///< as those of a Receiver
-};
-
 /// What is the same for all calls of one request.
 struct CallSettings {
-    const broker::Schema* schema;
+    const ClassRepository* classes;
     std::string principal;
     CMPIFlags flags = 0;
 };
 
-/// What came of one call, beside the objects that it delivered. After an error
-/// there are none.
+/// What came of one call, beside the objects that went to the receiver. After an error
+/// none of those count.
 struct CallOutcome {
     Status status;
     unsigned returnDoneCalls = 0;
@@ -78,33 +69,39 @@ struct CallOutcome {
 /// The status when a request is nested too deep; OK otherwise.
 [[nodiscard]] Status checkDepth();
 
-/// The end of a call that began when the sink was at `mark`: after an error nothing
-/// counts but its message. Throws what the sink has thrown.
-[[nodiscard]] CallOutcome finished(Status status, broker::ResultCollector& collector,
-                                   const Sink& sink, std::size_t mark);
+/// The status of several calls as one, and what was counted. `exact`: the client named
+/// the class that was asked, whose status is that of the whole.
+[[nodiscard]] RequestEnd endOf(const std::vector<CallOutcome>& calls, bool exact);
+
+// The receiver as the calls of a provider need it.
+void beginCall(const broker::AnyReceiver& receiver);
+/// The end of a call: after an error nothing counts but its message. Throws what the
+/// receiver has thrown.
+[[nodiscard]] CallOutcome finished(Status status, const broker::BrokerResult& result,
+                                   const broker::AnyReceiver& receiver);
 
 /// One call of a provider's slot, with everything that it needs: memory, context,
 /// result and object path. `invoke` gets those as (context, result, path)
 /// and gives a CMPIStatus. Too deep a nesting of requests is an
 /// error status. Throws broker::ConversionError for a path that cannot be handed
-/// over, and what the sink throws.
+/// over, and what the receiver throws.
 template <typename Invoke>
-CallOutcome callProvider(const CallSettings& settings, const Sink& sink, const std::string& who,
-                         const ObjectPath& path, Invoke&& invoke) {
+CallOutcome callProvider(const CallSettings& settings, const broker::AnyReceiver& receiver,
+                         const std::string& who, const ObjectPath& path, Invoke&& invoke) {
     if (Status tooDeep = checkDepth(); !tooDeep.ok()) {
         return {std::move(tooDeep)};
     }
     broker::RequestScope scope;
-    broker::ResultCollector collector(sink.kind, &sink.consumer);
-    const std::size_t mark = sink.mark();
+    beginCall(receiver);
+    const broker::BrokerResult result(receiver);
     broker::Arena& arena = scope.arena();
     const CMPIContext* const context =
         broker::makeContext(arena, path.nameSpace, settings.principal, settings.flags,
                             broker::RequestScope::depthOfThread());
-    const CMPIObjectPath* const record = broker::toRecord(arena, settings.schema, path);
+    const CMPIObjectPath* const record = broker::toRecord(arena, settings.classes, path);
     Status status = guardedCall(
-        who, [&] { return std::forward<Invoke>(invoke)(context, collector.record(), record); });
-    return finished(std::move(status), collector, sink, mark);
+        who, [&] { return std::forward<Invoke>(invoke)(context, result.record(), record); });
+    return finished(std::move(status), result, receiver);
 }
 
 }  // namespace cimom

@@ -2,7 +2,7 @@
 
 #include <dlfcn.h>
 
-#include "cimom/ObjectManager.h"
+#include "cimom/Registrations.h"
 
 namespace cimom {
 

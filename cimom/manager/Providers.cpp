@@ -5,7 +5,7 @@
 
 #include "broker/RequestScope.h"
 #include "broker/objects/BrokerContext.h"
-#include "cimom/ObjectManager.h"
+#include "cimom/Registrations.h"
 #include "manager/ProviderCall.h"
 
 namespace cimom {
@@ -118,9 +118,9 @@ CMPIAssociationMI* Provider::association(const std::string& nameSpace, Status& s
     return record(association_, "Association", nameSpace, status);
 }
 
-Providers::Providers(std::vector<std::filesystem::path> directories, const broker::Schema& schema,
-                     ObjectManager* manager)
-    : directories_(std::move(directories)), schema_(schema), manager_(manager) {}
+Providers::Providers(std::vector<std::filesystem::path> directories, const ClassRepository& classes,
+                     RequestHandler* handler)
+    : directories_(std::move(directories)), classes_(classes), handler_(handler) {}
 
 Provider& Providers::provider(const std::string& location, const std::string& name) {
     const std::lock_guard lock(mutex_);
@@ -139,7 +139,7 @@ Providers::Loaded& Providers::load(const std::string& location) {
         return *found;
     }
     auto library = std::make_unique<ProviderLibrary>(location, directories_);
-    auto broker = std::make_unique<broker::Broker>(schema_, manager_);
+    auto broker = std::make_unique<broker::Broker>(classes_, handler_);
     return loaded_.emplace_back(Loaded{location, std::move(broker), std::move(library)});
 }
 
@@ -154,7 +154,7 @@ void Providers::cleanUp(Provider& provider) {
         broker::RequestScope scope;
         const CMPIContext* const context =
             broker::makeContext(scope.arena(), "", "", 0, broker::RequestScope::depthOfThread());
-        // The provider is gone now, whatever it answers.
+        // The provider is gone now, whatever its status is.
         static_cast<void>(guardedCall(provider.name() + ": cleanup of " + kind,
                                       [&] { return record->ft->cleanup(record, context, 1); }));
     };

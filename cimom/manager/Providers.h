@@ -10,13 +10,14 @@
 #include <vector>
 
 #include "broker/Broker.h"
-#include "cimom/Cim.h"
+#include "cimom/Status.h"
 #include "manager/ProviderLibrary.h"
-#include "mof/Schema.h"
 
 namespace cimom {
 
+class ClassRepository;
 class Providers;
+class RequestHandler;
 
 /// One provider: a name in the factories of one library. Its tables are made
 /// when first asked for, once per kind. Safe for concurrent use.
@@ -52,9 +53,10 @@ class Provider {
 /// libraries; no request may run then.
 class Providers {
   public:
-    /// The schema and the manager must outlive the providers.
-    Providers(std::vector<std::filesystem::path> directories, const broker::Schema& schema,
-              ObjectManager* manager);
+    /// Classes and handler must outlive the providers. Without a handler, requests of
+    /// providers to each other are not supported.
+    Providers(std::vector<std::filesystem::path> directories, const ClassRepository& classes,
+              RequestHandler* handler);
     ~Providers();
     Providers(const Providers&) = delete;
     Providers& operator=(const Providers&) = delete;
@@ -75,8 +77,8 @@ class Providers {
     void cleanUp(Provider& provider);
 
     const std::vector<std::filesystem::path> directories_;
-    const broker::Schema& schema_;
-    ObjectManager* const manager_;
+    const ClassRepository& classes_;
+    RequestHandler* const handler_;
     /// Held while a library is loaded and while a factory runs; recursive since
     /// a factory may ask other providers.
     std::recursive_mutex mutex_;

@@ -1,3 +1,5 @@
+#include "cimom/Registrations.h"
+
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
@@ -7,7 +9,6 @@
 #include <utility>
 
 #include "cimom/Names.h"
-#include "cimom/ObjectManager.h"
 
 namespace cimom {
 
@@ -100,7 +101,7 @@ class RegistrationReader {
     void readEntry(std::string_view text) {
         const std::size_t colon = text.find(':');
         if (colon == std::string_view::npos) {
-            fail(line_, "\"" + std::string(text) + "\" is no line of the form KEY: VALUE");
+            fail(line_, "\"" + std::string(text) + "\" is not a line of the form KEY: VALUE");
         }
         if (!current_) {
             fail(line_, "the line stands before the first [CLASS]");
@@ -133,7 +134,7 @@ class RegistrationReader {
         once(!member.empty(), key);
         if (value.find_first_of(blanks) != std::string_view::npos ||
             value.find('/') != std::string_view::npos) {
-            fail(line_, "\"" + std::string(value) + "\" is no name for \"" + std::string(key) +
+            fail(line_, "\"" + std::string(value) + "\" is not a name for \"" + std::string(key) +
                             R"(:": blanks and "/" cannot be in it)");
         }
         member = value;
@@ -151,7 +152,7 @@ class RegistrationReader {
             } else if (!sameName(word, "method") && !sameName(word, "property") &&
                        !sameName(word, "indication")) {
                 // Those three are kinds that other object managers serve.
-                fail(line_, "\"" + word + "\" is no type of provider");
+                fail(line_, "\"" + word + "\" is not a type of provider");
             }
         }
     }
@@ -163,7 +164,7 @@ class RegistrationReader {
             word.erase(0, word.find_first_not_of('/'));
             word.erase(word.find_last_not_of('/') + 1);
             if (word.empty()) {
-                fail(line_, "\"/\" is no namespace");
+                fail(line_, "\"/\" is not a namespace");
             }
             current_->nameSpaces.push_back(std::move(word));
         }

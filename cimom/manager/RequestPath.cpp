@@ -98,8 +98,8 @@ Status canonicalize(ObjectPath& path, const ClassRepository& repository,
         const PropertyDeclaration* const property = declaration->property(key.name);
         if (property != nullptr && !property->isArray &&
             !retype(key.value, property->type, path.nameSpace)) {
-            return {CMPI_RC_ERR_INVALID_PARAMETER,
-                    "key " + property->name + " is no " + std::string(typeName(property->type))};
+            return {CMPI_RC_ERR_INVALID_PARAMETER, "key " + property->name + " is not of type " +
+                                                       std::string(typeName(property->type))};
         }
     }
     return {};

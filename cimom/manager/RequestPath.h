@@ -3,8 +3,9 @@
 #include <string>
 #include <vector>
 
-#include "cimom/Cim.h"
 #include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
+#include "cimom/Status.h"
 
 namespace cimom {
 

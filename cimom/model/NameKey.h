@@ -4,9 +4,9 @@
 #include <cstring>
 #include <string_view>
 
-#include "cimom/Cim.h"
+#include "cimom/Names.h"
 
-namespace cimom::broker {
+namespace cimom {
 
 /// A name with its hash, both without regard to case: computed once for all the
 /// look-ups that setting one property needs.
@@ -46,4 +46,4 @@ class NameKey {
     std::uint64_t hash_;
 };
 
-}  // namespace cimom::broker
+}  // namespace cimom

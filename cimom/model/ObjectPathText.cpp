@@ -221,13 +221,30 @@ std::string realText(double number) {
     return text.find_first_of(".e") == std::string::npos ? text + ".0" : text;
 }
 
-/// The text of a key's value; none for what has no text form: null, arrays,
-/// embedded instances.
-std::optional<std::string> valueText(const Value& value) {
-    const Scalar* const scalar = value.scalar();
-    if (scalar == nullptr) {
-        return std::nullopt;
+}  // namespace
+
+ObjectPath parseObjectPath(std::string_view text) {
+    return PathReader(text).read();
+}
+
+std::string toText(const ObjectPath& path) {
+    std::string text = path.nameSpace.empty() ? std::string() : path.nameSpace + ':';
+    text += path.className;
+    char separator = '.';
+    for (const NamedValue& key : path.keys) {
+        const Scalar* const scalar = key.value.scalar();
+        if (const auto value = scalar == nullptr ? std::nullopt : scalarText(*scalar)) {
+            text += separator;
+            text += key.name;
+            text += '=';
+            text += *value;
+            separator = ',';
+        }
     }
+    return text;
+}
+
+std::optional<std::string> scalarText(const Scalar& scalar) {
     return std::visit(
         [](const auto& held) -> std::optional<std::string> {
             using Held = std::decay_t<decltype(held)>;
@@ -249,29 +266,7 @@ std::optional<std::string> valueText(const Value& value) {
                 return std::nullopt;
             }
         },
-        *scalar);
-}
-
-}  // namespace
-
-ObjectPath parseObjectPath(std::string_view text) {
-    return PathReader(text).read();
-}
-
-std::string toText(const ObjectPath& path) {
-    std::string text = path.nameSpace.empty() ? std::string() : path.nameSpace + ':';
-    text += path.className;
-    char separator = '.';
-    for (const NamedValue& key : path.keys) {
-        if (const auto value = valueText(key.value)) {
-            text += separator;
-            text += key.name;
-            text += '=';
-            text += *value;
-            separator = ',';
-        }
-    }
-    return text;
+        scalar);
 }
 
 }  // namespace cimom

@@ -21,11 +21,11 @@ int openNameless(const std::string& directory) {
     if (fd >= 0) {
         return fd;
     }
-    // Not every file system has files that never had a name.
+    // Not every file system supports files without a name.
     std::string name = directory + "/cimdhcp.XXXXXX";
     const int named = ::mkostemp(name.data(), O_CLOEXEC);
     if (named >= 0) {
-        // Should this fail, the file is left behind, and does its duty all the same.
+        // If this fails, the file stays behind, and can be used all the same.
         static_cast<void>(::unlink(name.c_str()));
     }
     return named;

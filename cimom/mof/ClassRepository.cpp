@@ -32,7 +32,7 @@ std::string contentOf(const std::filesystem::path& file) {
         stream.read(block.data(), block.size());
         content.append(block.data(), static_cast<std::size_t>(stream.gcount()));
     } while (stream);
-    // Reading a directory opens well and ends here.
+    // A directory can be opened, but not read.
     if (stream.bad()) {
         failed();
     }
@@ -40,38 +40,6 @@ std::string contentOf(const std::filesystem::path& file) {
 }
 
 }  // namespace
-
-MofError::MofError(std::string fileName, std::size_t lineNumber, std::size_t columnNumber,
-                   const std::string& reason)
-    : std::runtime_error(fileName + ':' + std::to_string(lineNumber) + ':' +
-                         std::to_string(columnNumber) + ": " + reason),
-      file(std::move(fileName)),
-      line(lineNumber),
-      column(columnNumber) {}
-
-const Qualifier* PropertyDeclaration::qualifier(std::string_view qualifierName) const noexcept {
-    return findQualifier(qualifiers, qualifierName);
-}
-
-bool PropertyDeclaration::isKey() const noexcept {
-    return isTrue(qualifier("Key"));
-}
-
-const PropertyDeclaration* ClassDeclaration::property(
-    std::string_view propertyName) const noexcept {
-    const auto found = std::find_if(
-        properties.begin(), properties.end(),
-        [propertyName](const auto& each) { return sameName(each.name, propertyName); });
-    return found == properties.end() ? nullptr : &*found;
-}
-
-const Qualifier* ClassDeclaration::qualifier(std::string_view qualifierName) const noexcept {
-    return findQualifier(qualifiers, qualifierName);
-}
-
-bool ClassDeclaration::isAssociation() const noexcept {
-    return isTrue(qualifier("Association"));
-}
 
 class ClassRepository::Implementation {
   public:
@@ -86,7 +54,7 @@ class ClassRepository::Implementation {
         try {
             content = contentOf(file);
         } catch (const std::system_error& error) {
-            throw MofError(file.string(), 1, 1, "cannot be read: " + error.code().message());
+            throw MofError(file.string(), {}, "cannot be read: " + error.code().message());
         }
         std::error_code ignored;  // an empty name only delays the detection of a cycle
         const Including guard(including_, std::filesystem::weakly_canonical(file, ignored));
@@ -117,8 +85,7 @@ class ClassRepository::Implementation {
     void complete() const {
         for (const ReferenceUse& use : forwardReferences_) {
             if (find(use.className) == nullptr) {
-                throw MofError(use.file, use.position.line, use.position.column,
-                               "class " + use.className + " is not known");
+                throw MofError(use.file, use.position, "class " + use.className + " is not known");
             }
             checkNarrowing(use);
         }
@@ -135,12 +102,11 @@ class ClassRepository::Implementation {
         std::error_code error;
         const auto canonical = std::filesystem::canonical(included, error);
         if (error) {
-            throw MofError(file, pragma.position.line, pragma.position.column,
+            throw MofError(file, pragma.position,
                            included.string() + " cannot be read: " + error.message());
         }
         if (std::find(including_.begin(), including_.end(), canonical) != including_.end()) {
-            throw MofError(file, pragma.position.line, pragma.position.column,
-                           included.string() + " includes itself");
+            throw MofError(file, pragma.position, included.string() + " includes itself");
         }
         loadFile(included);
     }
@@ -151,15 +117,13 @@ class ClassRepository::Implementation {
 
     void add(const MofClass& written, const std::string& file) {
         if (find(written.name) != nullptr) {
-            throw MofError(file, written.position.line, written.position.column,
-                           "class " + written.name + " is declared twice");
+            throw MofError(file, written.position, "class " + written.name + " is declared twice");
         }
         Node* superclass = nullptr;
         if (!written.superclass.empty()) {
             const auto found = nodesByName_.find(written.superclass);
             if (found == nodesByName_.end()) {
-                throw MofError(file, written.superclassPosition.line,
-                               written.superclassPosition.column,
+                throw MofError(file, written.superclassPosition,
                                "superclass " + written.superclass + " is not known");
             }
             superclass = found->second;
@@ -175,6 +139,7 @@ class ClassRepository::Implementation {
             return known;
         });
         forwardReferences_.insert(forwardReferences_.end(), references.begin(), references.end());
+        declaration.index = PropertyIndex(declaration.properties);
         Node& node = nodes_.emplace_back(Node{std::move(declaration), superclass, {}});
         nodesByName_.emplace(node.declaration.name, &node);
         if (superclass != nullptr) {
@@ -184,8 +149,8 @@ class ClassRepository::Implementation {
 
     void checkNarrowing(const ReferenceUse& use) const {
         if (!use.formerClass.empty() && !isA(find(use.className), use.formerClass)) {
-            throw MofError(use.file, use.position.line, use.position.column,
-                           use.className + " is no subclass of " + use.formerClass +
+            throw MofError(use.file, use.position,
+                           use.className + " is not a subclass of " + use.formerClass +
                                ", which the superclass references");
         }
     }
@@ -231,7 +196,7 @@ void ClassRepository::loadDirectory(const std::filesystem::path& directory) {
             }
         }
     } catch (const std::filesystem::filesystem_error& error) {
-        throw MofError(directory.string(), 1, 1, "cannot be read: " + error.code().message());
+        throw MofError(directory.string(), {}, "cannot be read: " + error.code().message());
     }
     std::sort(files.begin(), files.end());
     for (const auto& file : files) {

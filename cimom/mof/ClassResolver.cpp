@@ -38,7 +38,7 @@ class Resolver {
 
   private:
     [[noreturn]] void fail(MofPosition position, const std::string& reason) const {
-        throw MofError(file_, position.line, position.column, reason);
+        throw MofError(file_, position, reason);
     }
 
     [[nodiscard]] std::vector<Qualifier> qualifiersOf(const std::vector<MofQualifier>& written,
@@ -49,8 +49,8 @@ class Resolver {
                                     : inheritQualifiers(std::move(own), written, *inherited, file_);
     }
 
-    /// What kind of class it is decides which qualifiers may stand at it, so this
-    /// looks at the bare text, before the qualifiers are resolved.
+    /// The kind of a class decides which qualifiers it may have, so it is read from
+    /// what is written, before the qualifiers are resolved.
     [[nodiscard]] MofScope classScope() const {
         const auto has = [this](std::string_view name) {
             const bool here = std::any_of(written_.qualifiers.begin(), written_.qualifiers.end(),

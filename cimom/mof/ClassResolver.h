@@ -3,7 +3,7 @@
 #include <string>
 #include <vector>
 
-#include "cimom/ClassRepository.h"
+#include "cimom/ClassDeclaration.h"
 #include "mof/MofSyntax.h"
 #include "mof/QualifierTypes.h"
 

@@ -7,7 +7,7 @@
 #include <utility>
 #include <variant>
 
-#include "cimom/ClassRepository.h"
+#include "cimom/MofError.h"
 #include "cimom/Names.h"
 #include "cimom/Utf8.h"
 
@@ -97,7 +97,7 @@ MofPosition MofLexer::here() const noexcept {
 }
 
 void MofLexer::fail(MofPosition position, const std::string& reason) const {
-    throw MofError(file_, position.line, position.column, reason);
+    throw MofError(file_, position, reason);
 }
 
 MofToken MofLexer::next() {
@@ -185,7 +185,7 @@ MofToken MofLexer::number() {
     const auto text = text_.substr(begin, offset_ - begin);
     const auto word = text.substr(isSigned ? 1 : 0);
     const bool negative = text.front() == '-';
-    const auto malformed = [&] { fail(start, '"' + std::string(text) + "\" is no number"); };
+    const auto malformed = [&] { fail(start, '"' + std::string(text) + "\" is not a number"); };
 
     if (word.find('.') != std::string_view::npos) {
         const auto real = parseReal(word);

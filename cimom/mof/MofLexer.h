@@ -4,6 +4,7 @@
 #include <string>
 #include <string_view>
 
+#include "cimom/Names.h"
 #include "mof/MofSyntax.h"
 
 namespace cimom {

@@ -5,7 +5,7 @@
 #include <limits>
 #include <utility>
 
-#include "cimom/ClassRepository.h"
+#include "cimom/MofError.h"
 
 namespace cimom {
 
@@ -102,7 +102,7 @@ void MofParser::failExpecting(std::string_view what) const {
 }
 
 void MofParser::fail(MofPosition position, const std::string& reason) const {
-    throw MofError(lexer_.file(), position.line, position.column, reason);
+    throw MofError(lexer_.file(), position, reason);
 }
 
 MofPragma MofParser::pragma() {
@@ -167,7 +167,7 @@ std::vector<MofScope> MofParser::scopes() {
             std::find_if(scopeNames.begin(), scopeNames.end(),
                          [&word](const ScopeName& each) { return word.isWord(each.name); });
         if (found == scopeNames.end()) {
-            fail(word.position, shown(word) + " is no scope");
+            fail(word.position, shown(word) + " is not a scope");
         }
         result.push_back(found->scope);
     } while (takeSymbol(','));
@@ -258,7 +258,7 @@ void MofParser::arrayForm(MofElement& result) {
         const auto size = std::get<MofInteger>(token.value);
         if (size.negative || size.magnitude == 0 ||
             size.magnitude > std::numeric_limits<std::uint32_t>::max()) {
-            fail(token.position, shown(token) + " is no size of an array");
+            fail(token.position, shown(token) + " is not a size of an array");
         }
         result.arraySize = static_cast<std::uint32_t>(size.magnitude);
     }
@@ -271,7 +271,7 @@ MofType MofParser::type() {
         return {*known, {}, name.position};
     }
     if (!ahead_.isWord("ref")) {
-        fail(name.position, shown(name) + " is no type");
+        fail(name.position, shown(name) + " is not a type");
     }
     take();
     return {Type::reference, std::string(name.text), name.position};
@@ -281,7 +281,7 @@ Type MofParser::dataType(std::string_view what) {
     const MofToken name = expectName(what);
     const auto known = mofType(name.text);
     if (!known) {
-        fail(name.position, shown(name) + " is no type");
+        fail(name.position, shown(name) + " is not a type");
     }
     return known.value_or(Type::string);
 }
@@ -340,7 +340,7 @@ void MofParser::flavor(MofFlavors& flavors) {
             return;
         }
     }
-    fail(word.position, shown(word) + " is no flavor");
+    fail(word.position, shown(word) + " is not a flavor");
 }
 
 MofInitializer MofParser::initializer() {

@@ -7,19 +7,12 @@
 #include <variant>
 #include <vector>
 
-#include "cimom/Cim.h"
+#include "cimom/MofError.h"
+#include "cimom/Value.h"
 
 /// What a MOF text says (DSP0004, annex A), before any of it is checked against
 /// other declarations.
 namespace cimom {
-
-/// Both count from 1; columns in bytes.
-struct MofPosition {
-    std::size_t line = 1;
-    std::size_t column = 1;
-
-    bool operator==(const MofPosition&) const = default;
-};
 
 /// Sign and magnitude, since the text alone does not tell which type it is for.
 struct MofInteger {
@@ -42,7 +35,7 @@ struct MofLiteral {
 /// One literal, or a list of them in braces.
 struct MofInitializer {
     bool isArray = false;
-    std::vector<MofLiteral> elements;  ///< exactly one when it is no array
+    std::vector<MofLiteral> elements;  ///< exactly one when it is not an array
     MofPosition position;
 
     bool operator==(const MofInitializer&) const = default;

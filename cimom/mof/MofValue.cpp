@@ -6,16 +6,12 @@
 #include <string_view>
 #include <utility>
 
-#include "cimom/ClassRepository.h"
+#include "cimom/MofError.h"
 #include "cimom/Names.h"
 
 namespace cimom {
 
 namespace {
-
-[[noreturn]] void fail(const std::string& file, MofPosition position, const std::string& reason) {
-    throw MofError(file, position.line, position.column, reason);
-}
 
 std::string shown(MofInteger integer) {
     return (integer.negative ? "-" : "") + std::to_string(integer.magnitude);
@@ -125,22 +121,23 @@ Scalar typedScalar(const MofLiteral& literal, Type type, const std::string& file
         if (auto scalar = integerOf(*integer, type, *limit)) {
             return *std::move(scalar);
         }
-        fail(file, literal.position,
-             shown(*integer) + " does not fit " + std::string(typeName(type)));
+        throw MofError(file, literal.position,
+                       shown(*integer) + " does not fit " + std::string(typeName(type)));
     }
     const auto real = isReal(type) ? realOf(constant) : std::nullopt;
     if (real) {
         if (type == Type::real32 && std::abs(*real) > std::numeric_limits<float>::max()) {
-            fail(file, literal.position, "this number does not fit real32");
+            throw MofError(file, literal.position, "this number does not fit real32");
         }
         return *real;
     }
     if (auto scalar = scalarOf(constant, type)) {
         return *std::move(scalar);
     }
-    fail(file, literal.position,
-         type == Type::reference ? "a reference can have no default value but NULL"
-                                 : "this is no value of type " + std::string(typeName(type)));
+    throw MofError(file, literal.position,
+                   type == Type::reference
+                       ? "a reference can have no default value but NULL"
+                       : "this is not a value of type " + std::string(typeName(type)));
 }
 
 }  // namespace
@@ -154,13 +151,13 @@ Value typedValue(const MofInitializer& initializer, Type type, bool isArray,
             return value;
         }
         if (isArray) {
-            fail(file, initializer.position, "a list in braces is needed here");
+            throw MofError(file, initializer.position, "a list in braces is needed here");
         }
         value.content = scalar;
         return value;
     }
     if (!isArray) {
-        fail(file, initializer.position, "one value is needed here, not a list");
+        throw MofError(file, initializer.position, "one value is needed here, not a list");
     }
     Array elements;
     elements.reserve(initializer.elements.size());

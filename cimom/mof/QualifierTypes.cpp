@@ -3,15 +3,12 @@
 #include <algorithm>
 #include <utility>
 
+#include "cimom/MofError.h"
 #include "mof/MofValue.h"
 
 namespace cimom {
 
 namespace {
-
-[[noreturn]] void fail(const std::string& file, MofPosition position, const std::string& reason) {
-    throw MofError(file, position.line, position.column, reason);
-}
 
 std::string_view shown(MofScope scope) {
     switch (scope) {
@@ -49,7 +46,8 @@ void QualifierTypes::add(const MofQualifierType& declaration, const std::string&
     entry.prototype.translatable = declaration.flavors.translatable.value_or(false);
     entry.scopes = declaration.scopes;
     if (!entries_.emplace(declaration.name, std::move(entry)).second) {
-        fail(file, declaration.position, "qualifier " + declaration.name + " is declared twice");
+        throw MofError(file, declaration.position,
+                       "qualifier " + declaration.name + " is declared twice");
     }
 }
 
@@ -59,7 +57,8 @@ std::vector<Qualifier> QualifierTypes::resolve(const std::vector<MofQualifier>& 
     result.reserve(written.size());
     for (const MofQualifier& qualifier : written) {
         if (findQualifier(result, qualifier.name) != nullptr) {
-            fail(file, qualifier.position, "qualifier " + qualifier.name + " is given twice");
+            throw MofError(file, qualifier.position,
+                           "qualifier " + qualifier.name + " is given twice");
         }
         result.push_back(resolveOne(qualifier, scope, file));
     }
@@ -70,15 +69,16 @@ Qualifier QualifierTypes::resolveOne(const MofQualifier& written, MofScope scope
                                      const std::string& file) const {
     const auto found = entries_.find(std::string_view(written.name));
     if (found == entries_.end()) {
-        fail(file, written.position, "qualifier " + written.name + " is not declared");
+        throw MofError(file, written.position, "qualifier " + written.name + " is not declared");
     }
     const auto& [prototype, scopes] = found->second;
     const bool allowed = std::any_of(scopes.begin(), scopes.end(), [scope](MofScope each) {
         return each == scope || each == MofScope::any;
     });
     if (!allowed) {
-        fail(file, written.position,
-             "qualifier " + written.name + " cannot stand at " + std::string(shown(scope)));
+        throw MofError(
+            file, written.position,
+            "qualifier " + written.name + " cannot stand at " + std::string(shown(scope)));
     }
     Qualifier result = prototype;
     const Type type = prototype.value.type;
@@ -91,7 +91,8 @@ Qualifier QualifierTypes::resolveOne(const MofQualifier& written, MofScope scope
                                                          : Value::null(type, isArray);
     }
     if (!prototype.overridable && written.flavors.overridable.value_or(false)) {
-        fail(file, written.position, "qualifier " + written.name + " cannot be made overridable");
+        throw MofError(file, written.position,
+                       "qualifier " + written.name + " cannot be made overridable");
     }
     result.overridable = written.flavors.overridable.value_or(prototype.overridable);
     result.toSubclass = written.flavors.toSubclass.value_or(prototype.toSubclass);
@@ -116,29 +117,13 @@ std::vector<Qualifier> inheritQualifiers(std::vector<Qualifier> own,
             if (here->value != above.value) {
                 // Qualifiers appended above never repeat a name, so `here` is a written one.
                 const auto index = static_cast<std::size_t>(here - own.begin());
-                fail(file, written.at(index).position,
-                     "qualifier " + above.name + " cannot be changed in a subclass");
+                throw MofError(file, written.at(index).position,
+                               "qualifier " + above.name + " cannot be changed in a subclass");
             }
             here->overridable = false;
         }
     }
     return own;
-}
-
-const Qualifier* findQualifier(const std::vector<Qualifier>& qualifiers,
-                               std::string_view name) noexcept {
-    const auto found =
-        std::find_if(qualifiers.begin(), qualifiers.end(),
-                     [name](const Qualifier& each) { return sameName(each.name, name); });
-    return found == qualifiers.end() ? nullptr : &*found;
-}
-
-bool isTrue(const Qualifier* qualifier) noexcept {
-    if (qualifier == nullptr || qualifier->value.scalar() == nullptr) {
-        return false;
-    }
-    const bool* const truth = std::get_if<bool>(qualifier->value.scalar());
-    return truth != nullptr && *truth;
 }
 
 }  // namespace cimom

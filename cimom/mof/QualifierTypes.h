@@ -5,7 +5,7 @@
 #include <unordered_map>
 #include <vector>
 
-#include "cimom/ClassRepository.h"
+#include "cimom/ClassDeclaration.h"
 #include "cimom/Names.h"
 #include "mof/MofSyntax.h"
 
@@ -45,11 +45,5 @@ class QualifierTypes {
                                                        const std::vector<MofQualifier>& written,
                                                        const std::vector<Qualifier>& inherited,
                                                        const std::string& file);
-
-/// Null when there is none of this name.
-[[nodiscard]] const Qualifier* findQualifier(const std::vector<Qualifier>& qualifiers,
-                                             std::string_view name) noexcept;
-/// False for null, too.
-[[nodiscard]] bool isTrue(const Qualifier* qualifier) noexcept;
 
 }  // namespace cimom

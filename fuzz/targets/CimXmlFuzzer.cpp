@@ -28,8 +28,8 @@ int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
         fuzz::require(*error.what() != '\0', "a refusal has a reason");
         return 0;
     }
-    const std::string refusal = cimom::wbem::errorAnswer(call, 1, fuzz::text(data, size));
-    const std::string empty = cimom::wbem::answerHead(call) + cimom::wbem::answerTail(call);
+    const std::string refusal = cimom::wbem::errorResponse(call, 1, fuzz::text(data, size));
+    const std::string empty = cimom::wbem::responseHead(call) + cimom::wbem::responseTail(call);
     for (const std::string& response : {refusal, empty}) {
         const XmlElement message = messageOf(response);
         const std::string* const id = message.attribute("ID");

@@ -118,7 +118,7 @@ struct Writer {
         add("max-stuck", limits.stuck);
         add("io-threads", limits.ioThreads);
         add("request-timeout", limits.request.count());
-        add("answer-timeout", limits.answer.count());
+        add("answer-timeout", limits.response.count());
         add("enumeration-timeout", limits.sessions.defaultTimeout.count());
         add("max-enumeration-timeout", limits.sessions.longestTimeout.count());
     }

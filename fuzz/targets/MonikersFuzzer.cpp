@@ -6,15 +6,15 @@
 #include "broker/Broker.h"
 #include "broker/Conversion.h"
 #include "broker/RequestScope.h"
+#include "cimom/ClassRepository.h"
 #include "cimom/ObjectPathText.h"
-#include "mof/Schema.h"
 #include "providerutilities/ProviderUtilities.h"
 
 namespace {
 
 using cimom::ObjectPath;
 
-/// What a provider's library has: a broker over a schema.
+/// What a provider's library has: a broker over a class repository.
 struct Host {
     static cimom::ClassRepository load() {
         cimom::ClassRepository loaded;
@@ -26,8 +26,7 @@ struct Host {
     }
 
     cimom::ClassRepository repository = load();
-    cimom::broker::Schema schema{repository};
-    cimom::broker::Broker broker{schema};
+    cimom::broker::Broker broker{repository};
 };
 
 /// The path with its text keys alone.
@@ -82,8 +81,8 @@ int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
         return 0;
     }
     const cimom::broker::RequestScope scope;
-    auto* const record =
-        cimom::broker::toRecord(cimom::broker::RequestScope::current().arena(), &host.schema, path);
+    auto* const record = cimom::broker::toRecord(cimom::broker::RequestScope::current().arena(),
+                                                 &host.repository, path);
     const ObjectPath back = cimom::broker::toModel(*record);
     fuzz::require(
         back == path && back.host == path.host && cimom::toText(back) == cimom::toText(path),

@@ -7,14 +7,14 @@
 
 #include "broker/Broker.h"
 #include "broker/RequestScope.h"
-#include "mof/Schema.h"
+#include "cimom/ClassRepository.h"
 
 namespace cimom::test {
 
 /// A broker as a provider sees it, inside of a request.
 class TestBroker : public testing::Test {
   protected:
-    TestBroker() : repository(load()), schema(repository), broker(schema), mb(broker.record()) {}
+    TestBroker() : repository(load()), broker(repository), mb(broker.record()) {}
 
     static ClassRepository load() {
         ClassRepository loaded;
@@ -38,7 +38,6 @@ class TestBroker : public testing::Test {
     }
 
     ClassRepository repository;
-    broker::Schema schema;
     broker::Broker broker;
     const CMPIBroker* mb;
     broker::RequestScope scope;

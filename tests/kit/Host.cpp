@@ -4,8 +4,6 @@ namespace test {
 
 namespace {
 
-using Kind = cimom::broker::ResultCollector::Kind;
-
 cimom::ClassRepository loadSchema() {
     cimom::ClassRepository repository;
     repository.loadDirectory(ZR_SOURCE_DIR "/schema");
@@ -26,8 +24,7 @@ std::unique_ptr<cimom::ObjectManager> manageNeighbours() {
 Host::Host(Neighbours neighbours, Calls calls)
     : manager_(neighbours == Neighbours::served ? manageNeighbours() : nullptr),
       repository_(loadSchema()),
-      schema_(repository_),
-      real_(schema_, manager_.get()) {
+      real_(repository_, manager_.get()) {
     if (calls == Calls::counted) {
         counted_.emplace(real_.record());
     }
@@ -64,8 +61,8 @@ Host::Answer Host::modify(const cimom::ObjectPath& path, const cimom::Instance* 
         const CMPIInstance* newInstanceRecord =
             instance == nullptr
                 ? nullptr
-                : cimom::broker::toRecord(cimom::broker::RequestScope::current().arena(), &schema_,
-                                          *instance);
+                : cimom::broker::toRecord(cimom::broker::RequestScope::current().arena(),
+                                          &repository_, *instance);
         if (counted_) {
             newInstanceRecord = counted_->standIn(newInstanceRecord);
         }

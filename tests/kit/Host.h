@@ -13,11 +13,9 @@
 #include "broker/RequestScope.h"
 #include "broker/objects/BrokerContext.h"
 #include "broker/objects/BrokerResult.h"
-#include "cimom/Cim.h"
 #include "cimom/ClassRepository.h"
 #include "cimom/ObjectManager.h"
 #include "kit/CountedBroker.h"
-#include "mof/Schema.h"
 
 namespace test {
 
@@ -69,25 +67,31 @@ class Host {
     Answer referenceNames(const cimom::ObjectPath& path, const char* resultClass);
     Answer references(const cimom::ObjectPath& path, const char* resultClass);
 
+    enum class Kind { paths, instances };
+
     /// Runs something in a request of its own: `call(context, result, path)`.
     template <typename Call>
-    Answer request(cimom::broker::ResultCollector::Kind kind, const cimom::ObjectPath& path,
-                   const Call& call) {
+    Answer request(Kind kind, const cimom::ObjectPath& path, const Call& call) {
         const cimom::broker::RequestScope scope;
-        cimom::broker::ResultCollector collector(kind);
+        cimom::CollectedObjects<cimom::ObjectPath> paths;
+        cimom::CollectedObjects<cimom::Instance> instances;
+        cimom::broker::AnyReceiver receiver = &instances;
+        if (kind == Kind::paths) {
+            receiver = &paths;
+        }
+        const cimom::broker::BrokerResult handedOver(receiver);
         cimom::broker::Arena& arena = cimom::broker::RequestScope::current().arena();
         const CMPIContext* context = cimom::broker::makeContext(arena, path.nameSpace, "", 0, 1);
-        const CMPIObjectPath* record = cimom::broker::toRecord(arena, &schema_, path);
-        const CMPIResult* result = collector.record();
+        const CMPIObjectPath* record = cimom::broker::toRecord(arena, &repository_, path);
+        const CMPIResult* result = handedOver.record();
         if (counted_) {
             counted_->beginRequest();
             record = counted_->standIn(record);
             result = counted_->standIn(result);
         }
         const CMPIStatus status = call(context, result, record);
-        cimom::broker::Delivery delivery = collector.take();
-        return {status.rc, status.msg != nullptr, std::move(delivery.paths),
-                std::move(delivery.instances), delivery.returnDoneCalls};
+        return {status.rc, status.msg != nullptr, std::move(paths.objects),
+                std::move(instances.objects), handedOver.returnDoneCalls()};
     }
 
     const cimom::ClassRepository& repository() const { return repository_; }
@@ -95,7 +99,6 @@ class Host {
   private:
     std::unique_ptr<cimom::ObjectManager> manager_;
     cimom::ClassRepository repository_;
-    cimom::broker::Schema schema_;
     cimom::broker::Broker real_;
     std::optional<CountedBroker> counted_;
     CMPIInstanceMI* instanceMI_;

@@ -118,8 +118,7 @@ std::string ProviderHost::builtLibraries() {
 
 ProviderHost::ProviderHost(const std::string& directory)
     : manager_(configuration(directory)),
-      schema_(manager_.repository()),
-      broker_(schema_, &manager_),
+      broker_(manager_.repository(), &manager_),
       handle_(::dlopen((directory + '/' + library).c_str(), RTLD_NOW | RTLD_LOCAL)) {
     using Factory = CMPIInstanceMI* (*)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
     if (!handle_) {
@@ -185,7 +184,7 @@ ScriptAnswer ProviderHost::runDirectly(const ScriptRequest& request,
                 return table.createInstance(
                     instance_, context, result, record,
                     cimom::broker::toRecord(cimom::broker::RequestScope::current().arena(),
-                                            &schema_, cimom::Instance{path, {}}));
+                                            &manager_.repository(), cimom::Instance{path, {}}));
             case Operation::remove:
                 return table.deleteInstance(instance_, context, result, record);
             case Operation::query:
@@ -194,16 +193,10 @@ ScriptAnswer ProviderHost::runDirectly(const ScriptRequest& request,
                 return table.enumerateInstances(instance_, context, result, record, nullptr);
         }
     };
-    std::vector<std::optional<cimom::Instance>> instances;
-    const cimom::Sink sink{
-        cimom::broker::ResultCollector::Kind::instances,
-        {nullptr,
-         [&](std::optional<cimom::Instance> each) { instances.push_back(std::move(each)); }},
-        [&] { return instances.size(); },
-        [&](std::size_t mark) { instances.resize(mark); }};
+    cimom::CollectedObjects<cimom::Instance> instances;
     const cimom::CallOutcome outcome =
-        cimom::callProvider({&schema_, "", 0}, sink, "provider", path, ask);
-    return answerOf(outcome.status, instances);
+        cimom::callProvider({&manager_.repository(), "", 0}, &instances, "provider", path, ask);
+    return answerOf(outcome.status, instances.objects);
 }
 
 }  // namespace test

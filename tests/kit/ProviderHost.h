@@ -10,7 +10,6 @@
 #include "broker/Broker.h"
 #include "cimom/ObjectManager.h"
 #include "kit/Script.h"
-#include "mof/Schema.h"
 
 namespace test {
 
@@ -57,7 +56,6 @@ class ProviderHost {
     cimom::ObjectManager manager_;
     // For what the object manager does not offer: the same library's table, asked with
     // a broker of its own.
-    cimom::broker::Schema schema_;
     cimom::broker::Broker broker_;
     std::unique_ptr<void, Closed> handle_;
     CMPIInstanceMI* instance_ = nullptr;

@@ -4,7 +4,7 @@
 #include <random>
 #include <string>
 
-#include "cimom/Cim.h"
+#include "cimom/Instance.h"
 
 namespace cimom::test {
 

@@ -2,6 +2,7 @@
 
 #include <utility>
 
+#include "cimom/Names.h"
 #include "kit/StrictHost.h"
 #include "kit/StrictObjects.h"
 
@@ -18,7 +19,7 @@ CMPIInstance* newInstance(const CMPIBroker* broker, const CMPIObjectPath* path,
                           CMPIStatus* status) {
     const StrictHost* host = hostOf(broker, "newInstance");
     const PathObject* object = RequestObjects::get<PathObject>(path, "newInstance");
-    answer(status, host == nullptr || object == nullptr ? CMPI_RC_ERR_FAILED : CMPI_RC_OK);
+    setStatus(status, host == nullptr || object == nullptr ? CMPI_RC_ERR_FAILED : CMPI_RC_OK);
     if (host == nullptr || object == nullptr) {
         return nullptr;
     }
@@ -31,29 +32,29 @@ CMPIObjectPath* newObjectPath(const CMPIBroker* broker, const char* nameSpace,
     const StrictHost* host = hostOf(broker, "newObjectPath");
     if (host == nullptr || !given(nameSpace, "newObjectPath", "namespace") ||
         !given(className, "newObjectPath", "class name")) {
-        answer(status, CMPI_RC_ERR_INVALID_PARAMETER);
+        setStatus(status, CMPI_RC_ERR_INVALID_PARAMETER);
         return nullptr;
     }
-    answer(status, CMPI_RC_OK);
+    setStatus(status, CMPI_RC_OK);
     return RequestObjects::make<PathObject>(host->repository(),
                                             cimom::ObjectPath{"", nameSpace, className, {}});
 }
 
 CMPIString* newString(const CMPIBroker* broker, const char* text, CMPIStatus* status) {
     if (hostOf(broker, "newString") == nullptr || !given(text, "newString", "text")) {
-        answer(status, CMPI_RC_ERR_INVALID_PARAMETER);
+        setStatus(status, CMPI_RC_ERR_INVALID_PARAMETER);
         return nullptr;
     }
-    answer(status, CMPI_RC_OK);
+    setStatus(status, CMPI_RC_OK);
     return RequestObjects::make<StringObject>(text);
 }
 
 CMPIArray* newArray(const CMPIBroker* broker, CMPICount size, CMPIType type, CMPIStatus* status) {
     if (hostOf(broker, "newArray") == nullptr) {
-        answer(status, CMPI_RC_ERR_INVALID_HANDLE);
+        setStatus(status, CMPI_RC_ERR_INVALID_HANDLE);
         return nullptr;
     }
-    answer(status, CMPI_RC_OK);
+    setStatus(status, CMPI_RC_OK);
     return RequestObjects::make<ArrayObject>(size, type);
 }
 
@@ -63,10 +64,10 @@ CMPIBoolean classPathIsA(const CMPIBroker* broker, const CMPIObjectPath* path, c
     const StrictHost* host = hostOf(broker, "classPathIsA");
     const PathObject* object = RequestObjects::get<PathObject>(path, "classPathIsA");
     if (host == nullptr || object == nullptr || !given(ancestor, "classPathIsA", "class name")) {
-        answer(status, CMPI_RC_ERR_INVALID_PARAMETER);
+        setStatus(status, CMPI_RC_ERR_INVALID_PARAMETER);
         return 0;
     }
-    answer(status, CMPI_RC_OK);
+    setStatus(status, CMPI_RC_OK);
     const cimom::ObjectPath& model = object->model;
     const bool derives =
         !model.nameSpace.empty() && host->repository().isA(model.className, ancestor);
@@ -87,12 +88,12 @@ CMPIEnumeration* enumerateInstances(const CMPIBroker* broker, const CMPIContext*
                                     CMPIStatus* status) {
     const PathObject* object = asked(broker, context, path, "enumerateInstances");
     if (object == nullptr) {
-        answer(status, CMPI_RC_ERR_INVALID_PARAMETER);
+        setStatus(status, CMPI_RC_ERR_INVALID_PARAMETER);
         return nullptr;
     }
     StrictHost& host = StrictHost::of(broker);
     StrictHost::Answer given = host.enumerate(object->model, properties);
-    answer(status, given.code);
+    setStatus(status, given.code);
     return given.code == CMPI_RC_OK ? RequestObjects::make<EnumerationObject>(
                                           host.repository(), std::move(given.instances))
                                     : nullptr;
@@ -102,7 +103,7 @@ CMPIInstance* getInstance(const CMPIBroker* broker, const CMPIContext* context,
                           const CMPIObjectPath* path, const char** properties, CMPIStatus* status) {
     const PathObject* object = asked(broker, context, path, "getInstance");
     if (object == nullptr) {
-        answer(status, CMPI_RC_ERR_INVALID_PARAMETER);
+        setStatus(status, CMPI_RC_ERR_INVALID_PARAMETER);
         return nullptr;
     }
     StrictHost& host = StrictHost::of(broker);
@@ -110,7 +111,7 @@ CMPIInstance* getInstance(const CMPIBroker* broker, const CMPIContext* context,
     // OK without an instance is one that was not found.
     const CMPIrc code =
         given.code == CMPI_RC_OK && given.instances.empty() ? CMPI_RC_ERR_NOT_FOUND : given.code;
-    answer(status, code);
+    setStatus(status, code);
     return code == CMPI_RC_OK
                ? RequestObjects::make<InstanceObject>(host.repository(), given.instances.front())
                : nullptr;

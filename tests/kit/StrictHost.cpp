@@ -6,6 +6,7 @@
 #include <exception>
 #include <utility>
 
+#include "cimom/Names.h"
 #include "kit/StrictBroker.h"
 
 namespace strict {
@@ -46,7 +47,7 @@ CMPIStatus callSlot(const char* name, Slot slot, Arguments... arguments) {
 }
 
 void append(StrictHost::Answer& all, StrictHost::Answer one) {
-    // The first error is the answer, and what was delivered before it is discarded.
+    // The first error is the result, and what was handed over before it is discarded.
     if (all.code != CMPI_RC_OK || one.code != CMPI_RC_OK) {
         all = {all.code == CMPI_RC_OK ? one.code : all.code, {}, {}};
         return;

@@ -58,7 +58,7 @@ void* RequestObjects::find(const void* record) {
     return nullptr;
 }
 
-void answer(CMPIStatus* status, CMPIrc code) {
+void setStatus(CMPIStatus* status, CMPIrc code) {
     if (status != nullptr) {
         *status = {code, nullptr};
     }
@@ -79,7 +79,7 @@ constexpr int oldLevel = 1;  // what SFCB says in most of its tables
 
 const char* getCharPtr(const CMPIString* string, CMPIStatus* status) {
     StringObject* object = RequestObjects::get<StringObject>(string, "getCharPtr");
-    answer(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    setStatus(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
     return object == nullptr ? nullptr : object->text.data();
 }
 
@@ -101,11 +101,11 @@ CMPIStatus setElementAt(const CMPIArray* array, CMPICount index, const CMPIValue
 
 // Object paths.
 
-/// A text of a path; an object manager may answer null for one that is not set.
+/// A text of a path; an object manager may give null for one that is not set.
 CMPIString* component(const CMPIObjectPath* path, CMPIStatus* status, const char* function,
                       std::string cimom::ObjectPath::*member) {
     const PathObject* object = RequestObjects::get<PathObject>(path, function);
-    answer(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    setStatus(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
     if (object == nullptr || (object->model.*member).empty()) {
         return nullptr;
     }
@@ -136,12 +136,12 @@ CMPIStatus addKey(const CMPIObjectPath* path, const char* name, const CMPIValue*
 CMPIData getKey(const CMPIObjectPath* path, const char* name, CMPIStatus* status) {
     const PathObject* object = RequestObjects::get<PathObject>(path, "getKey");
     if (object == nullptr || !given(name, "getKey", "name")) {
-        answer(status, CMPI_RC_ERR_INVALID_HANDLE);
+        setStatus(status, CMPI_RC_ERR_INVALID_HANDLE);
         return missing();
     }
     const cimom::Value* value = object->model.key(name);
     // So says SFCB of a missing key, and other object managers something else.
-    answer(status, value == nullptr ? CMPI_RC_ERR_NOT_FOUND : CMPI_RC_OK);
+    setStatus(status, value == nullptr ? CMPI_RC_ERR_NOT_FOUND : CMPI_RC_OK);
     return value == nullptr ? missing() : dataFrom(*object->repository, *value, CMPI_keyValue);
 }
 
@@ -149,10 +149,10 @@ CMPIData getKeyAt(const CMPIObjectPath* path, CMPICount index, CMPIString** name
                   CMPIStatus* status) {
     const PathObject* object = RequestObjects::get<PathObject>(path, "getKeyAt");
     if (object == nullptr || index >= object->model.keys.size()) {
-        answer(status, CMPI_RC_ERR_NO_SUCH_PROPERTY);
+        setStatus(status, CMPI_RC_ERR_NO_SUCH_PROPERTY);
         return missing();
     }
-    answer(status, CMPI_RC_OK);
+    setStatus(status, CMPI_RC_OK);
     const cimom::NamedValue& key = object->model.keys[index];
     if (name != nullptr) {
         *name = RequestObjects::make<StringObject>(key.name);
@@ -162,13 +162,13 @@ CMPIData getKeyAt(const CMPIObjectPath* path, CMPICount index, CMPIString** name
 
 CMPICount getKeyCount(const CMPIObjectPath* path, CMPIStatus* status) {
     const PathObject* object = RequestObjects::get<PathObject>(path, "getKeyCount");
-    answer(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    setStatus(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
     return object == nullptr ? 0 : static_cast<CMPICount>(object->model.keys.size());
 }
 
 CMPIString* pathToString(const CMPIObjectPath* path, CMPIStatus* status) {
     const PathObject* object = RequestObjects::get<PathObject>(path, "toString");
-    answer(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    setStatus(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
     return object == nullptr ? nullptr
                              : RequestObjects::make<StringObject>(cimom::toText(object->model));
 }
@@ -178,11 +178,11 @@ CMPIString* pathToString(const CMPIObjectPath* path, CMPIStatus* status) {
 CMPIData getProperty(const CMPIInstance* instance, const char* name, CMPIStatus* status) {
     const InstanceObject* object = RequestObjects::get<InstanceObject>(instance, "getProperty");
     if (object == nullptr || !given(name, "getProperty", "name")) {
-        answer(status, CMPI_RC_ERR_INVALID_HANDLE);
+        setStatus(status, CMPI_RC_ERR_INVALID_HANDLE);
         return missing();
     }
     const cimom::Value* value = object->model.property(name);
-    answer(status, value == nullptr ? CMPI_RC_ERR_NO_SUCH_PROPERTY : CMPI_RC_OK);
+    setStatus(status, value == nullptr ? CMPI_RC_ERR_NO_SUCH_PROPERTY : CMPI_RC_OK);
     return value == nullptr ? missing() : dataFrom(*object->repository, *value, CMPI_goodValue);
 }
 
@@ -202,7 +202,7 @@ CMPIStatus setProperty(const CMPIInstance* instance, const char* name, const CMP
 
 CMPIObjectPath* getObjectPath(const CMPIInstance* instance, CMPIStatus* status) {
     const InstanceObject* object = RequestObjects::get<InstanceObject>(instance, "getObjectPath");
-    answer(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    setStatus(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
     return object == nullptr
                ? nullptr
                : RequestObjects::make<PathObject>(*object->repository, object->model.path);
@@ -219,14 +219,14 @@ CMPIInstance* deadInstance() {
 CMPIData getNext(const CMPIEnumeration* enumeration, CMPIStatus* status) {
     EnumerationObject* object = RequestObjects::get<EnumerationObject>(enumeration, "getNext");
     if (object == nullptr || object->next == object->items.size()) {
-        // Past the end there is an error status, and data that nobody may look at.
-        answer(status, CMPI_RC_ERR_FAILED);
+        // Past the end there is an error status, and data that must not be read.
+        setStatus(status, CMPI_RC_ERR_FAILED);
         CMPIData undefined{};
         undefined.type = CMPI_instance;
         undefined.value.inst = deadInstance();
         return undefined;
     }
-    answer(status, CMPI_RC_OK);
+    setStatus(status, CMPI_RC_OK);
     CMPIData data{};
     data.type = CMPI_instance;
     data.value.inst =
@@ -238,7 +238,7 @@ CMPIData getNext(const CMPIEnumeration* enumeration, CMPIStatus* status) {
 CMPIBoolean hasNext(const CMPIEnumeration* enumeration, CMPIStatus* status) {
     const EnumerationObject* object =
         RequestObjects::get<EnumerationObject>(enumeration, "hasNext");
-    answer(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    setStatus(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
     return object != nullptr && object->next < object->items.size() ? 1 : 0;
 }
 
@@ -249,12 +249,12 @@ CMPIData getEntry(const CMPIContext* context, const char* name, CMPIStatus* stat
     if (object != nullptr && given(name, "getEntry", "name")) {
         for (const cimom::NamedValue& entry : object->entries) {
             if (entry.name == name) {
-                answer(status, CMPI_RC_OK);
+                setStatus(status, CMPI_RC_OK);
                 return dataFrom(*object->repository, entry.value, CMPI_goodValue);
             }
         }
     }
-    answer(status, CMPI_RC_ERR_NO_SUCH_PROPERTY);
+    setStatus(status, CMPI_RC_ERR_NO_SUCH_PROPERTY);
     return missing();
 }
 

@@ -9,12 +9,13 @@
 #include <utility>
 #include <vector>
 
-#include "cimom/Cim.h"
 #include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
+#include "cimom/Status.h"
 
 /// What a strict object manager hands to a provider: objects of its own, with tables
 /// that hold what each object manager fills and nothing else. Where a real one would
-/// die or send its client an empty answer, a violation is noted.
+/// die or send its client an empty response, a violation is noted.
 namespace strict {
 
 /// What a provider did that some object manager does not survive. Safe for
@@ -126,7 +127,7 @@ struct ContextObject : CMPIContext {
     std::vector<cimom::NamedValue> entries;
 };
 
-/// The result of a request: what was delivered.
+/// The result of a request: what was handed over.
 struct ResultObject : CMPIResult {
     using Record = CMPIResult;
     static const CMPIResultFT table;
@@ -140,7 +141,7 @@ struct ResultObject : CMPIResult {
 };
 
 /// Writes a status where the caller wants one.
-void answer(CMPIStatus* status, CMPIrc code);
+void setStatus(CMPIStatus* status, CMPIrc code);
 
 /// Notes a violation when an argument is null.
 bool given(const void* argument, const char* function, const char* name);

@@ -4,6 +4,7 @@
 #include <memory>
 
 #include "broker/BrokerTypes.h"
+#include "cimom/Names.h"
 #include "cimom/ObjectPathText.h"
 #include "kit/StrictObjects.h"
 

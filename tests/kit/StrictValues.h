@@ -5,8 +5,8 @@
 #include <string>
 #include <vector>
 
-#include "cimom/Cim.h"
 #include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
 
 /// Between the values of CMPI and those of the model, and the checks of what a
 /// provider sets and delivers. Each wrong value is a violation.

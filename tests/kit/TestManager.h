@@ -30,9 +30,9 @@ inline Library openTestLibrary(int flags) {
 }
 
 /// Calls one of the library's functions that tell about it.
-template <typename Answer>
-Answer ask(const Library& library, const char* function) {
-    return reinterpret_cast<Answer (*)()>(dlsym(library.get(), function))();
+template <typename Fact>
+Fact ask(const Library& library, const char* function) {
+    return reinterpret_cast<Fact (*)()>(dlsym(library.get(), function))();
 }
 
 /// An object manager with the well-behaved test providers.

@@ -181,14 +181,14 @@ std::optional<HttpResponse> RawClient::receive() {
     return response;
 }
 
-bool RawClient::awaitAnswer() {
+bool RawClient::awaitResponse() {
     std::array<char, 1> byte{};
     return ::recv(fd_, byte.data(), byte.size(), MSG_PEEK) == 1;
 }
 
-bool RawClient::isAnsweredWithin(std::chrono::milliseconds time) {
+bool RawClient::isRespondedWithin(std::chrono::milliseconds time) {
     pollfd wanted{fd_, POLLIN, 0};
-    return ::poll(&wanted, 1, static_cast<int>(time.count())) == 1 && awaitAnswer();
+    return ::poll(&wanted, 1, static_cast<int>(time.count())) == 1 && awaitResponse();
 }
 
 std::optional<HttpResponse> RawClient::receiveAny() {
@@ -316,7 +316,7 @@ HttpResponse TestServer::ask(const std::string& request) {
     client.send(request);
     auto response = client.receive();
     if (!response) {
-        ADD_FAILURE() << "no answer to " << request.substr(0, 500);
+        ADD_FAILURE() << "no response to " << request.substr(0, 500);
         return {};
     }
     return *std::move(response);

@@ -60,13 +60,13 @@ class RawClient {
 
     /// False when the server has closed the connection.
     bool send(const std::string& bytes);
-    /// The next answer; none when the connection ends before it is whole. The body of
+    /// The next response; none when the connection ends before it is whole. The body of
     /// a good one must be of the structure of DSP0203.
     std::optional<HttpResponse> receive();
-    /// Waits until an answer begins to arrive, and reads nothing of it.
-    bool awaitAnswer();
-    /// Whether anything of an answer arrives in that time; reads nothing of it.
-    bool isAnsweredWithin(std::chrono::milliseconds time);
+    /// Waits until a response begins to arrive, and reads nothing of it.
+    bool awaitResponse();
+    /// Whether anything of a response arrives in that time; reads nothing of it.
+    bool isRespondedWithin(std::chrono::milliseconds time);
     /// Waits for the server to close the connection; false after ten seconds.
     bool waitForEnd();
 
@@ -107,7 +107,7 @@ class TestServer {
     TestServer(wbem::ServerSettings settings, Configuration configuration);
 
     [[nodiscard]] std::uint16_t port() const { return server_.port(); }
-    /// Asks over a connection of its own. Fails the test when there is no answer.
+    /// Sends a request over a connection of its own. Fails the test when there is no response.
     HttpResponse ask(const std::string& request);
     /// The response to an operation, which must have been carried out.
     wbem::XmlElement call(const std::string& method, const std::string& parameters,

@@ -20,7 +20,6 @@
 #include "kit/CountedBroker.h"
 #include "kit/LogCapture.h"
 #include "kit/Tree.h"
-#include "mof/Schema.h"
 
 CMPI_EXTERN_C CMPIInstanceMI* DHCPClientNeighbours_Create_InstanceMI(const CMPIBroker* broker,
                                                                      const CMPIContext* ctx,
@@ -28,7 +27,6 @@ CMPI_EXTERN_C CMPIInstanceMI* DHCPClientNeighbours_Create_InstanceMI(const CMPIB
 
 namespace {
 
-using cimom::broker::ResultCollector;
 using test::CountedBroker;
 using test::dhcpInterface;
 using test::Fault;
@@ -42,7 +40,7 @@ using ::testing::IsEmpty;
 using ZR::Testing::LogCapture;
 
 using Texts = std::vector<std::string>;
-using Kind = ResultCollector::Kind;
+enum class Kind { paths, instances };
 
 cimom::ClassRepository loadSchema() {
     cimom::ClassRepository repository;
@@ -99,20 +97,25 @@ class NeighboursTest : public test::TreeTest {
     template <typename Call>
     Response request(Kind kind, const std::string& path, const Call& call) {
         const cimom::broker::RequestScope scope;
-        ResultCollector collector(kind);
+        cimom::CollectedObjects<cimom::ObjectPath> paths;
+        cimom::CollectedObjects<cimom::Instance> instances;
+        cimom::broker::AnyReceiver receiver = &instances;
+        if (kind == Kind::paths) {
+            receiver = &paths;
+        }
+        const cimom::broker::BrokerResult handedOver(receiver);
         cimom::broker::Arena& arena = cimom::broker::RequestScope::current().arena();
         const CMPIContext* context = cimom::broker::makeContext(arena, "root/cimv2", "", 0, 1);
         broker_.beginRequest();
-        const CMPIObjectPath* record = broker_.standIn(
-            cimom::broker::toRecord(arena, &schema_, cimom::parseObjectPath("root/cimv2:" + path)));
-        const CMPIStatus status = call(context, broker_.standIn(collector.record()), record);
+        const CMPIObjectPath* record = broker_.standIn(cimom::broker::toRecord(
+            arena, &repository_, cimom::parseObjectPath("root/cimv2:" + path)));
+        const CMPIStatus status = call(context, broker_.standIn(handedOver.record()), record);
         EXPECT_EQ(status.msg, nullptr);
-        cimom::broker::Delivery delivery = collector.take();
-        Response response{status.rc, {}, {}, delivery.returnDoneCalls};
-        for (const auto& each : delivery.paths) {
+        Response response{status.rc, {}, {}, handedOver.returnDoneCalls()};
+        for (const auto& each : paths.objects) {
             response.paths.push_back(toText(each.value()));
         }
-        for (const auto& each : delivery.instances) {
+        for (const auto& each : instances.objects) {
             response.instances.push_back(each.value());
         }
         return response;
@@ -144,8 +147,7 @@ class NeighboursTest : public test::TreeTest {
     }
 
     cimom::ClassRepository repository_ = loadSchema();
-    cimom::broker::Schema schema_{repository_};
-    cimom::broker::Broker real_{schema_};
+    cimom::broker::Broker real_{repository_};
     CountedBroker broker_{real_.record()};
     CMPIInstanceMI* mi_ =
         DHCPClientNeighbours_Create_InstanceMI(broker_.record(), nullptr, nullptr);

@@ -2,17 +2,16 @@
 
 #include <algorithm>
 
+#include "MessageHead.h"
 #include "cimom/Names.h"
 #include "cimxml/Errors.h"
+#include "cimxml/HttpStatus.h"
 #include "cimxml/ObjectReader.h"
 #include "cimxml/XmlText.h"
 
 namespace cimom::wbem {
 
 namespace {
-
-constexpr unsigned badRequest = 400;
-constexpr unsigned notImplemented = 501;
 
 /// A version that differs in its second number alone is compatible.
 void checkVersion(const XmlElement& element, const char* name, std::string_view major,
@@ -22,7 +21,7 @@ void checkVersion(const XmlElement& element, const char* name, std::string_view 
         std::string_view(version).substr(std::min(version.size(), major.size()));
     if (!version.starts_with(major) || minor.empty() ||
         !std::all_of(minor.begin(), minor.end(), [](char c) { return isDigit(c) || c == '.'; })) {
-        throw HttpFailure(notImplemented, cimError, std::string(name) + " " + version);
+        throw HttpFailure(http::notImplemented, cimError, std::string(name) + " " + version);
     }
 }
 
@@ -56,7 +55,8 @@ Call readMessage(XmlElement cim) {
                               : cim.children.front().children.front();
     static_cast<void>(onlyChild(message));
     if (request.name == "MULTIREQ") {
-        throw HttpFailure(notImplemented, "multiple-requests-unsupported", "several requests");
+        throw HttpFailure(http::notImplemented, "multiple-requests-unsupported",
+                          "several requests");
     }
     expectName(request, "SIMPLEREQ");
     expectNoText(request);
@@ -83,9 +83,20 @@ Call readMessage(XmlElement cim) {
     return call;
 }
 
-std::string head(const Call& call) {
-    std::string text =
-        R"(<?xml version="1.0" encoding="utf-8"?><CIM CIMVERSION="2.0" DTDVERSION="2.0"><MESSAGE)";
+}  // namespace
+
+Call readCall(std::string_view body, std::size_t maximumDepth) {
+    try {
+        return readMessage(readXml(body, maximumDepth));
+    } catch (const XmlError& error) {
+        throw HttpFailure(http::badRequest, "request-not-well-formed", error.what());
+    } catch (const NotValid& error) {
+        throw HttpFailure(http::badRequest, "request-not-valid", error.what());
+    }
+}
+
+std::string responseHead(const Call& call) {
+    std::string text(messageHead);
     appendAttribute(text, "ID", call.messageId);
     appendAttribute(text, "PROTOCOLVERSION", "1.0");
     text += "><SIMPLERSP>";
@@ -94,32 +105,16 @@ std::string head(const Call& call) {
     return text + '>';
 }
 
-}  // namespace
-
-Call readCall(std::string_view body, std::size_t maximumDepth) {
-    try {
-        return readMessage(readXml(body, maximumDepth));
-    } catch (const XmlError& error) {
-        throw HttpFailure(badRequest, "request-not-well-formed", error.what());
-    } catch (const NotValid& error) {
-        throw HttpFailure(badRequest, "request-not-valid", error.what());
-    }
-}
-
-std::string answerHead(const Call& call) {
-    return head(call);
-}
-
-std::string answerTail(const Call& call) {
+std::string responseTail(const Call& call) {
     return std::string(call.intrinsic ? "</IMETHODRESPONSE>" : "</METHODRESPONSE>") +
            "</SIMPLERSP></MESSAGE></CIM>\n";
 }
 
-std::string errorAnswer(const Call& call, unsigned code, std::string_view description) {
-    std::string text = head(call) + "<ERROR";
+std::string errorResponse(const Call& call, unsigned code, std::string_view description) {
+    std::string text = responseHead(call) + "<ERROR";
     appendAttribute(text, "CODE", std::to_string(code));
     appendAttribute(text, "DESCRIPTION", description.empty() ? cimStatusName(code) : description);
-    return text + "/>" + answerTail(call);
+    return text + "/>" + responseTail(call);
 }
 
 }  // namespace cimom::wbem

@@ -2,7 +2,7 @@
 
 #include <array>
 
-#include "cimom/Cim.h"
+#include "cimom/Status.h"
 
 namespace cimom::wbem {
 

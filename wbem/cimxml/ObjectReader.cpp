@@ -33,8 +33,9 @@ void refuseTooMany(const XmlElement& element) {
 /// Throws the CIM error for a value that its type does not have.
 [[noreturn]] void noValue(const std::string& text, Type type, const std::string& name) {
     constexpr std::size_t shown = 80;
-    throw CimError(CimStatus::invalidParameter, name + ": \"" + text.substr(0, shown) +
-                                                    "\" is no " + std::string(typeName(type)));
+    throw CimError(
+        CimStatus::invalidParameter,
+        name + ": \"" + text.substr(0, shown) + "\" is not of type " + std::string(typeName(type)));
 }
 
 Scalar readScalar(const std::string& text, Type type, const std::string& name) {
@@ -75,7 +76,7 @@ Value readKeyValue(const XmlElement& element, const std::string& name) {
     auto number = readNumberText(element.text);
     if (!number) {
         throw CimError(CimStatus::invalidParameter,
-                       name + ": \"" + element.text + "\" is no number");
+                       name + ": \"" + element.text + "\" is not a number");
     }
     return *std::move(number);
 }

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <memory>
 
+#include "cimom/Names.h"
 #include "cimom/ObjectPathText.h"
 #include "cimxml/ScalarText.h"
 #include "cimxml/XmlText.h"

@@ -2,6 +2,7 @@
 
 #include <utility>
 
+#include "MessageHead.h"
 #include "cimom/Names.h"
 #include "cimxml/ObjectWriter.h"
 #include "cimxml/XmlText.h"
@@ -84,9 +85,8 @@ OperationRequest& OperationRequest::namedInstance(const char* name, const Instan
 }
 
 std::string OperationRequest::body() const {
-    std::string text =
-        R"(<?xml version="1.0" encoding="utf-8"?><CIM CIMVERSION="2.0" DTDVERSION="2.0">)"
-        R"(<MESSAGE ID="1" PROTOCOLVERSION="1.0"><SIMPLEREQ><IMETHODCALL)";
+    std::string text(messageHead);
+    text += R"( ID="1" PROTOCOLVERSION="1.0"><SIMPLEREQ><IMETHODCALL)";
     appendAttribute(text, "NAME", method_);
     text += '>';
     writeLocalNamespacePath(text, nameSpace_);

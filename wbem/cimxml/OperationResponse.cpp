@@ -4,6 +4,7 @@
 #include <system_error>
 #include <utility>
 
+#include "cimom/Names.h"
 #include "cimxml/Errors.h"
 #include "cimxml/ObjectReader.h"
 #include "cimxml/PathLocation.h"
@@ -38,8 +39,8 @@ OperationResponse readResponse(std::string_view body, std::string_view method,
     XmlElement cim = readXml(body, maximumDepth);
     expectName(cim, "CIM");
     XmlElement& message = onlyChildOf(cim, "MESSAGE");
-    XmlElement& answer = onlyChildOf(message, "SIMPLERSP");
-    XmlElement& result = onlyChildOf(answer, "IMETHODRESPONSE");
+    XmlElement& simple = onlyChildOf(message, "SIMPLERSP");
+    XmlElement& result = onlyChildOf(simple, "IMETHODRESPONSE");
     if (!sameName(requiredAttribute(result, "NAME"), method)) {
         throw NotValid("a response to " + requiredAttribute(result, "NAME"));
     }
@@ -48,7 +49,7 @@ OperationResponse readResponse(std::string_view body, std::string_view method,
     if (result.children.empty()) {
         return response;
     }
-    // Output parameters stand behind the result; no operation that is asked has any.
+    // Output parameters stand behind the result; no operation that the client requests has any.
     XmlElement& first = result.children.front();
     if (first.name == "ERROR") {
         readError(first, response);

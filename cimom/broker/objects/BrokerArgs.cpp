@@ -53,7 +53,7 @@ CMPIStatus addArg(const CMPIArgs* self, const char* name, const CMPIValue* value
 CMPIData getArg(const CMPIArgs* self, const char* name, CMPIStatus* rc) {
     const ArgsRecord* const args = argsOf(self);
     if (args == nullptr) {
-        answer(rc, CMPI_RC_ERR_INVALID_HANDLE);
+        setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE);
         return badData();
     }
     return dataByName(args->entries, name, CMPI_goodValue, rc);
@@ -62,7 +62,7 @@ CMPIData getArg(const CMPIArgs* self, const char* name, CMPIStatus* rc) {
 CMPIData getArgAt(const CMPIArgs* self, CMPICount index, CMPIString** name, CMPIStatus* rc) {
     const ArgsRecord* const args = argsOf(self);
     if (args == nullptr) {
-        answer(rc, CMPI_RC_ERR_INVALID_HANDLE);
+        setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE);
         return badData();
     }
     return dataAt(args->entries, index, CMPI_goodValue, name, rc);
@@ -70,7 +70,7 @@ CMPIData getArgAt(const CMPIArgs* self, CMPICount index, CMPIString** name, CMPI
 
 CMPICount getArgCount(const CMPIArgs* self, CMPIStatus* rc) {
     const ArgsRecord* const args = argsOf(self);
-    answer(rc, args == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    setStatus(rc, args == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
     return args == nullptr ? 0 : args->entries.size();
 }
 

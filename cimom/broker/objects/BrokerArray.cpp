@@ -35,27 +35,27 @@ CMPIArray* clone(const CMPIArray* self, CMPIStatus* rc) {
 
 CMPICount getSize(const CMPIArray* self, CMPIStatus* rc) {
     const ArrayRecord* const array = arrayOf(self);
-    answer(rc, array == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    setStatus(rc, array == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
     return array == nullptr ? 0 : array->size;
 }
 
 CMPIType getSimpleType(const CMPIArray* self, CMPIStatus* rc) {
     const ArrayRecord* const array = arrayOf(self);
-    answer(rc, array == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    setStatus(rc, array == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
     return array == nullptr ? CMPI_null : array->elementType;
 }
 
 CMPIData getElementAt(const CMPIArray* self, CMPICount index, CMPIStatus* rc) {
     const ArrayRecord* const array = arrayOf(self);
     if (array == nullptr) {
-        answer(rc, CMPI_RC_ERR_INVALID_HANDLE);
+        setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE);
         return badData();
     }
     if (index >= array->size) {
-        answer(rc, CMPI_RC_ERR_NO_SUCH_PROPERTY);
+        setStatus(rc, CMPI_RC_ERR_NO_SUCH_PROPERTY);
         return missingData();
     }
-    answer(rc, CMPI_RC_OK);
+    setStatus(rc, CMPI_RC_OK);
     return array->elements[index];
 }
 

@@ -36,7 +36,7 @@ CMPIContext* clone(const CMPIContext* self, CMPIStatus* rc) {
 CMPIData getEntry(const CMPIContext* self, const char* name, CMPIStatus* rc) {
     const ContextRecord* const context = contextOf(self);
     if (context == nullptr) {
-        answer(rc, CMPI_RC_ERR_INVALID_HANDLE);
+        setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE);
         return badData();
     }
     return dataByName(context->entries, name, CMPI_goodValue, rc);
@@ -45,7 +45,7 @@ CMPIData getEntry(const CMPIContext* self, const char* name, CMPIStatus* rc) {
 CMPIData getEntryAt(const CMPIContext* self, CMPICount index, CMPIString** name, CMPIStatus* rc) {
     const ContextRecord* const context = contextOf(self);
     if (context == nullptr) {
-        answer(rc, CMPI_RC_ERR_INVALID_HANDLE);
+        setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE);
         return badData();
     }
     return dataAt(context->entries, index, CMPI_goodValue, name, rc);
@@ -53,7 +53,7 @@ CMPIData getEntryAt(const CMPIContext* self, CMPICount index, CMPIString** name,
 
 CMPICount getEntryCount(const CMPIContext* self, CMPIStatus* rc) {
     const ContextRecord* const context = contextOf(self);
-    answer(rc, context == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    setStatus(rc, context == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
     return context == nullptr ? 0 : context->entries.size();
 }
 

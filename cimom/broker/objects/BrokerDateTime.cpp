@@ -3,6 +3,7 @@
 #include <chrono>
 
 #include "broker/objects/BrokerStatus.h"
+#include "cimom/Status.h"
 
 namespace cimom::broker {
 
@@ -42,27 +43,27 @@ CMPIDateTime* clone(const CMPIDateTime* self, CMPIStatus* rc) {
 CMPIUint64 getBinaryFormat(const CMPIDateTime* self, CMPIStatus* rc) {
     const DateTimeRecord* const dateTime = dateTimeOf(self);
     if (dateTime == nullptr) {
-        answer(rc, CMPI_RC_ERR_INVALID_HANDLE);
+        setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE);
         return 0;
     }
     if (dateTime->value.microseconds < 0) {
         // The binary form is unsigned and counts from 1970.
-        answer(rc, CMPI_RC_ERR_FAILED);
+        setStatus(rc, CMPI_RC_ERR_FAILED);
         return 0;
     }
-    answer(rc, CMPI_RC_OK);
+    setStatus(rc, CMPI_RC_OK);
     return static_cast<CMPIUint64>(dateTime->value.microseconds);
 }
 
 CMPIString* getStringFormat(const CMPIDateTime* self, CMPIStatus* rc) {
     const DateTimeRecord* const dateTime = dateTimeOf(self);
-    answer(rc, dateTime == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    setStatus(rc, dateTime == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
     return dateTime == nullptr ? nullptr : dateTime->text;
 }
 
 CMPIBoolean isInterval(const CMPIDateTime* self, CMPIStatus* rc) {
     const DateTimeRecord* const dateTime = dateTimeOf(self);
-    answer(rc, dateTime == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    setStatus(rc, dateTime == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
     return dateTime != nullptr && dateTime->value.interval ? 1 : 0;
 }
 

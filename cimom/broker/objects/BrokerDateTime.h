@@ -24,7 +24,7 @@ extern const CMPIDateTimeFT dateTimeTable;
 /// Null unless the datetime was made by this broker and is alive.
 [[nodiscard]] DateTimeRecord* dateTimeOf(const CMPIDateTime* dateTime) noexcept;
 
-/// Null for a text that is no datetime. Throws std::bad_alloc.
+/// Null for a text that is not a datetime. Throws std::bad_alloc.
 DateTimeRecord* makeDateTime(Arena& arena, std::string_view text);
 /// Null for a value that has no text.
 DateTimeRecord* makeDateTime(Arena& arena, const DateTime& value);

@@ -1,6 +1,7 @@
 #include "broker/objects/BrokerEnumeration.h"
 
 #include "broker/objects/BrokerStatus.h"
+#include "cimom/Status.h"
 
 namespace cimom::broker {
 
@@ -36,28 +37,28 @@ CMPIEnumeration* clone(const CMPIEnumeration* self, CMPIStatus* rc) {
 CMPIData getNext(const CMPIEnumeration* self, CMPIStatus* rc) {
     EnumerationRecord* const enumeration = enumerationOf(self);
     if (enumeration == nullptr) {
-        answer(rc, CMPI_RC_ERR_INVALID_HANDLE);
+        setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE);
         return badData();
     }
     if (enumeration->next >= enumeration->elements->size) {
-        // No code of this level names the end.
-        answer(rc, CMPI_RC_ERR_NOT_FOUND);
+        // CMPI 2.0 has no status code for the end.
+        setStatus(rc, CMPI_RC_ERR_NOT_FOUND);
         return missingData();
     }
-    answer(rc, CMPI_RC_OK);
+    setStatus(rc, CMPI_RC_OK);
     return enumeration->elements->elements[enumeration->next++];
 }
 
 CMPIBoolean hasNext(const CMPIEnumeration* self, CMPIStatus* rc) {
     const EnumerationRecord* const enumeration = enumerationOf(self);
-    answer(rc, enumeration == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    setStatus(rc, enumeration == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
     return enumeration != nullptr && enumeration->next < enumeration->elements->size ? 1 : 0;
 }
 
 /// All elements, wherever the cursor stands.
 CMPIArray* toArray(const CMPIEnumeration* self, CMPIStatus* rc) {
     const EnumerationRecord* const enumeration = enumerationOf(self);
-    answer(rc, enumeration == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    setStatus(rc, enumeration == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
     return enumeration == nullptr ? nullptr : enumeration->elements;
 }
 

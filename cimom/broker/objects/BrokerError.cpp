@@ -53,7 +53,7 @@ CMPIError* clone(const CMPIError* self, CMPIStatus* rc) {
 template <auto member, typename Result>
 Result get(const CMPIError* self, CMPIStatus* rc) {
     const ErrorRecord* const error = errorOf(self);
-    answer(rc, error == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    setStatus(rc, error == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
     return error == nullptr ? Result{} : Result{error->*member};
 }
 

@@ -5,6 +5,7 @@
 #include "broker/Arena.h"
 #include "broker/objects/BrokerArray.h"
 #include "broker/objects/BrokerString.h"
+#include "cimom/Status.h"
 
 namespace cimom::broker {
 

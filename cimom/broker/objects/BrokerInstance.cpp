@@ -2,6 +2,9 @@
 
 #include "broker/BrokerTypes.h"
 #include "broker/objects/BrokerStatus.h"
+#include "cimom/ClassRepository.h"
+#include "cimom/Names.h"
+#include "model/NameKey.h"
 
 namespace cimom::broker {
 
@@ -35,7 +38,7 @@ CMPIInstance* clone(const CMPIInstance* self, CMPIStatus* rc) {
 CMPIData getProperty(const CMPIInstance* self, const char* name, CMPIStatus* rc) {
     const InstanceRecord* const instance = instanceOf(self);
     if (instance == nullptr) {
-        answer(rc, CMPI_RC_ERR_INVALID_HANDLE);
+        setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE);
         return badData();
     }
     return dataByName(instance->properties, name, CMPI_goodValue, rc);
@@ -45,7 +48,7 @@ CMPIData getPropertyAt(const CMPIInstance* self, CMPICount index, CMPIString** n
                        CMPIStatus* rc) {
     const InstanceRecord* const instance = instanceOf(self);
     if (instance == nullptr) {
-        answer(rc, CMPI_RC_ERR_INVALID_HANDLE);
+        setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE);
         return badData();
     }
     return dataAt(instance->properties, index, CMPI_goodValue, name, rc);
@@ -53,7 +56,7 @@ CMPIData getPropertyAt(const CMPIInstance* self, CMPICount index, CMPIString** n
 
 CMPICount getPropertyCount(const CMPIInstance* self, CMPIStatus* rc) {
     const InstanceRecord* const instance = instanceOf(self);
-    answer(rc, instance == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    setStatus(rc, instance == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
     return instance == nullptr ? 0 : instance->properties.size();
 }
 
@@ -138,7 +141,7 @@ CMPIStatus setObjectPath(const CMPIInstance* self, const CMPIObjectPath* path) {
         }
         instance->path = copyPath(*instance->arena, *source);
         instance->declaration =
-            source->schema == nullptr ? nullptr : source->schema->find(source->className->view());
+            source->classes == nullptr ? nullptr : source->classes->find(source->className->view());
         instance->handedOut->store(nullptr, std::memory_order_release);
         return CMPI_RC_OK;
     });
@@ -176,14 +179,14 @@ CMPIStatus setPropertyFilter(const CMPIInstance* self, const char** names, const
 InstanceRecord* make(Arena& arena, const PathRecord& path) {
     auto* const handedOut = arena.make<std::atomic<PathRecord*>>(nullptr);
     auto* const instance = arena.make<InstanceRecord>();
-    *instance =
-        InstanceRecord{{instance, &instanceTable},
-                       &arena,
-                       copyPath(arena, path),
-                       path.schema == nullptr ? nullptr : path.schema->find(path.className->view()),
-                       EntryList{},
-                       PropertyFilter{},
-                       handedOut};
+    *instance = InstanceRecord{
+        {instance, &instanceTable},
+        &arena,
+        copyPath(arena, path),
+        path.classes == nullptr ? nullptr : path.classes->find(path.className->view()),
+        EntryList{},
+        PropertyFilter{},
+        handedOut};
     return instance;
 }
 

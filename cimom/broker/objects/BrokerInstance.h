@@ -7,7 +7,10 @@
 #include "broker/Arena.h"
 #include "broker/objects/BrokerObjectPath.h"
 #include "broker/objects/BrokerValues.h"
-#include "mof/Schema.h"
+
+namespace cimom {
+struct ClassDeclaration;
+}
 
 namespace cimom::broker {
 
@@ -23,7 +26,7 @@ struct PropertyFilter {
 struct InstanceRecord : CMPIInstance {
     Arena* arena;
     PathRecord* path;
-    const ClassIndex* declaration;  ///< null: its class is unknown, nothing is checked
+    const ClassDeclaration* declaration;  ///< null: its class is unknown, nothing is checked
     EntryList properties;
     PropertyFilter filter;
     /// The copy of the path last handed out; handed out again while neither has changed.

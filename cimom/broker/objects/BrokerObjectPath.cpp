@@ -53,7 +53,7 @@ CMPIStatus setComponent(const CMPIObjectPath* self, const char* text) {
 template <Component component>
 CMPIString* getComponent(const CMPIObjectPath* self, CMPIStatus* rc) {
     const PathRecord* const path = pathOf(self);
-    answer(rc, path == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    setStatus(rc, path == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
     return path == nullptr ? nullptr : path->*component;
 }
 
@@ -83,7 +83,7 @@ CMPIStatus addKey(const CMPIObjectPath* self, const char* key, const CMPIValue* 
 CMPIData getKey(const CMPIObjectPath* self, const char* key, CMPIStatus* rc) {
     const PathRecord* const path = pathOf(self);
     if (path == nullptr) {
-        answer(rc, CMPI_RC_ERR_INVALID_HANDLE);
+        setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE);
         return badData();
     }
     return dataByName(path->keys, key, CMPI_keyValue, rc);
@@ -92,7 +92,7 @@ CMPIData getKey(const CMPIObjectPath* self, const char* key, CMPIStatus* rc) {
 CMPIData getKeyAt(const CMPIObjectPath* self, CMPICount index, CMPIString** name, CMPIStatus* rc) {
     const PathRecord* const path = pathOf(self);
     if (path == nullptr) {
-        answer(rc, CMPI_RC_ERR_INVALID_HANDLE);
+        setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE);
         return badData();
     }
     return dataAt(path->keys, index, CMPI_keyValue, name, rc);
@@ -100,7 +100,7 @@ CMPIData getKeyAt(const CMPIObjectPath* self, CMPICount index, CMPIString** name
 
 CMPICount getKeyCount(const CMPIObjectPath* self, CMPIStatus* rc) {
     const PathRecord* const path = pathOf(self);
-    answer(rc, path == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    setStatus(rc, path == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
     return path == nullptr ? 0 : path->keys.size();
 }
 
@@ -146,13 +146,13 @@ CMPIData getPropertyQualifier(const CMPIObjectPath* self, const char* property, 
 
 /// Methods are not part of the repository.
 CMPIData getMethodQualifier(const CMPIObjectPath*, const char*, const char*, CMPIStatus* rc) {
-    answer(rc, CMPI_RC_ERR_NOT_SUPPORTED);
+    setStatus(rc, CMPI_RC_ERR_NOT_SUPPORTED);
     return missingData();
 }
 
 CMPIData getParameterQualifier(const CMPIObjectPath*, const char*, const char*, const char*,
                                CMPIStatus* rc) {
-    answer(rc, CMPI_RC_ERR_NOT_SUPPORTED);
+    setStatus(rc, CMPI_RC_ERR_NOT_SUPPORTED);
     return missingData();
 }
 
@@ -195,12 +195,12 @@ PathRecord* pathOf(const CMPIObjectPath* path) noexcept {
                                                            : nullptr;
 }
 
-PathRecord* makePath(Arena& arena, const Schema* schema, std::string_view nameSpace,
+PathRecord* makePath(Arena& arena, const ClassRepository* classes, std::string_view nameSpace,
                      std::string_view className) {
     auto* const path = arena.make<PathRecord>();
     *path = PathRecord{{path, &objectPathTable},
                        &arena,
-                       schema,
+                       classes,
                        emptyString(),
                        nameSpace.empty() ? emptyString() : makeString(arena, nameSpace),
                        className.empty() ? emptyString() : makeString(arena, className),
@@ -213,7 +213,7 @@ PathRecord* copyPath(Arena& arena, const PathRecord& path) {
     auto* const copy = arena.make<PathRecord>();
     *copy = PathRecord{{copy, &objectPathTable},
                        &arena,
-                       path.schema,
+                       path.classes,
                        stringIn(arena, *path.host),
                        stringIn(arena, *path.nameSpace),
                        stringIn(arena, *path.className),

@@ -5,7 +5,10 @@
 #include "broker/Arena.h"
 #include "broker/objects/BrokerString.h"
 #include "broker/objects/BrokerValues.h"
-#include "mof/Schema.h"
+
+namespace cimom {
+class ClassRepository;
+}
 
 namespace cimom::broker {
 
@@ -13,7 +16,7 @@ namespace cimom::broker {
 // NOLINTNEXTLINE(cppcoreguidelines-pro-type-member-init): the arena value-initialises it
 struct PathRecord : CMPIObjectPath {
     Arena* arena;
-    const Schema* schema;  ///< null: no class is known
+    const ClassRepository* classes;  ///< null: no class is known
     StringRecord* host;
     StringRecord* nameSpace;
     StringRecord* className;
@@ -27,7 +30,7 @@ extern const CMPIObjectPathFT objectPathTable;
 [[nodiscard]] PathRecord* pathOf(const CMPIObjectPath* path) noexcept;
 
 /// Throw std::bad_alloc.
-PathRecord* makePath(Arena& arena, const Schema* schema, std::string_view nameSpace,
+PathRecord* makePath(Arena& arena, const ClassRepository* classes, std::string_view nameSpace,
                      std::string_view className);
 PathRecord* copyPath(Arena& arena, const PathRecord& path);
 

@@ -11,27 +11,26 @@ namespace cimom::broker {
 
 namespace {
 
-ResultCollector* collectorOf(const CMPIResult* result) noexcept {
-    return result != nullptr && result->ft == &resultTable
-               ? static_cast<ResultCollector*>(result->hdl)
-               : nullptr;
+BrokerResult* resultOf(const CMPIResult* result) noexcept {
+    return result != nullptr && result->ft == &resultTable ? static_cast<BrokerResult*>(result->hdl)
+                                                           : nullptr;
 }
 
 /// Results belong to the request alone.
 CMPIStatus release(CMPIResult* self) {
-    return statusOf(collectorOf(self) == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    return statusOf(resultOf(self) == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
 }
 
 CMPIResult* clone(const CMPIResult*, CMPIStatus* rc) {
-    answer(rc, CMPI_RC_ERR_NOT_SUPPORTED);
+    setStatus(rc, CMPI_RC_ERR_NOT_SUPPORTED);
     return nullptr;
 }
 
 template <typename Item>
-CMPIStatus deliver(const CMPIResult* self, const Item* item) {
+CMPIStatus handOver(const CMPIResult* self, const Item* item) {
     return guarded([=] {
-        ResultCollector* const collector = collectorOf(self);
-        return collector == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : collector->add(item);
+        BrokerResult* const result = resultOf(self);
+        return result == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : result->add(item);
     });
 }
 
@@ -40,38 +39,38 @@ CMPIStatus deliver(const CMPIResult* self, const Item* item) {
 CMPIStatus returnData(const CMPIResult* self, const CMPIValue* value, CMPIType type) {
     switch (type) {
         case CMPI_instance:
-            return deliver<CMPIInstance>(
+            return handOver<CMPIInstance>(
                 self, value == nullptr ? nullptr : memberOf<CMPIInstance*>(value));
         case CMPI_ref:
-            return deliver<CMPIObjectPath>(
+            return handOver<CMPIObjectPath>(
                 self, value == nullptr ? nullptr : memberOf<CMPIObjectPath*>(value));
         default:
-            return statusOf(collectorOf(self) == nullptr ? CMPI_RC_ERR_INVALID_HANDLE
-                                                         : CMPI_RC_ERR_NOT_SUPPORTED);
+            return statusOf(resultOf(self) == nullptr ? CMPI_RC_ERR_INVALID_HANDLE
+                                                      : CMPI_RC_ERR_NOT_SUPPORTED);
     }
 }
 
 CMPIStatus returnInstance(const CMPIResult* self, const CMPIInstance* instance) {
-    return deliver(self, instance);
+    return handOver(self, instance);
 }
 
 CMPIStatus returnObjectPath(const CMPIResult* self, const CMPIObjectPath* path) {
-    return deliver(self, path);
+    return handOver(self, path);
 }
 
 CMPIStatus returnDone(const CMPIResult* self) {
     return guarded([=] {
-        ResultCollector* const collector = collectorOf(self);
-        if (collector == nullptr) {
+        BrokerResult* const result = resultOf(self);
+        if (result == nullptr) {
             return CMPI_RC_ERR_INVALID_HANDLE;
         }
-        collector->done();
+        result->done();
         return CMPI_RC_OK;
     });
 }
 
 CMPIStatus returnError(const CMPIResult* self, const CMPIError* error) {
-    return deliver(self, error);
+    return handOver(self, error);
 }
 
 }  // namespace
@@ -79,33 +78,32 @@ CMPIStatus returnError(const CMPIResult* self, const CMPIError* error) {
 const CMPIResultFT resultTable{CMPIVersion200, release,          clone,      returnData,
                                returnInstance, returnObjectPath, returnDone, returnError};
 
-ResultCollector::ResultCollector(Kind kind, const Consumer* consumer) noexcept
-    : kind_(kind), consumer_(consumer), record_{this, &resultTable} {}
+BrokerResult::BrokerResult(const AnyReceiver& receiver) noexcept
+    : receiver_(receiver), record_{this, &resultTable} {}
 
-Delivery ResultCollector::take() {
-    const std::lock_guard lock(mutex_);
-    return std::exchange(delivery_, Delivery{});
-}
-
-std::exception_ptr ResultCollector::failure() const {
+std::exception_ptr BrokerResult::failure() const {
     const std::lock_guard lock(mutex_);
     return failure_;
 }
 
+unsigned BrokerResult::returnDoneCalls() const {
+    const std::lock_guard lock(mutex_);
+    return returnDoneCalls_;
+}
+
+std::string BrokerResult::errorMessage() const {
+    const std::lock_guard lock(mutex_);
+    return errorMessage_;
+}
+
 template <typename Object>
-CMPIrc ResultCollector::pass(std::optional<Object> object,
-                             std::function<void(std::optional<Object>)> Consumer::*receive,
-                             std::vector<std::optional<Object>>& kept) {
+CMPIrc BrokerResult::pass(ResultReceiver<Object>& receiver, std::optional<Object> object) {
     const std::lock_guard lock(mutex_);
     if (failure_) {
         return CMPI_RC_ERR_FAILED;
     }
-    if (consumer_ == nullptr) {
-        kept.push_back(std::move(object));
-        return CMPI_RC_OK;
-    }
     try {
-        (consumer_->*receive)(std::move(object));
+        receiver.take(std::move(object));
         return CMPI_RC_OK;
     } catch (const std::exception&) {
         failure_ = std::current_exception();
@@ -113,7 +111,7 @@ CMPIrc ResultCollector::pass(std::optional<Object> object,
     }
 }
 
-CMPIrc ResultCollector::add(const CMPIInstance* instance) {
+CMPIrc BrokerResult::add(const CMPIInstance* instance) {
     if (failure()) {
         return CMPI_RC_ERR_FAILED;
     }
@@ -121,18 +119,15 @@ CMPIrc ResultCollector::add(const CMPIInstance* instance) {
     if (instance != nullptr && record == nullptr) {
         return CMPI_RC_ERR_INVALID_PARAMETER;
     }
-    if (kind_ == Kind::paths) {
+    if (wantsPaths(receiver_)) {
         // A request for names gets the instance's name.
         return add(record == nullptr ? nullptr : static_cast<const CMPIObjectPath*>(record->path));
     }
-    std::optional<Instance> copy;
-    if (record != nullptr) {
-        copy = toModel(*record);
-    }
-    return pass(std::move(copy), &Consumer::instance, delivery_.instances);
+    return pass(*std::get<ResultReceiver<Instance>*>(receiver_),
+                record == nullptr ? std::nullopt : std::optional(toModel(*record)));
 }
 
-CMPIrc ResultCollector::add(const CMPIObjectPath* path) {
+CMPIrc BrokerResult::add(const CMPIObjectPath* path) {
     if (failure()) {
         return CMPI_RC_ERR_FAILED;
     }
@@ -140,34 +135,31 @@ CMPIrc ResultCollector::add(const CMPIObjectPath* path) {
     if (path != nullptr && record == nullptr) {
         return CMPI_RC_ERR_INVALID_PARAMETER;
     }
-    if (kind_ == Kind::instances && record != nullptr) {
-        return CMPI_RC_ERR_NOT_SUPPORTED;
+    if (wantsPaths(receiver_)) {
+        return pass(*std::get<ResultReceiver<ObjectPath>*>(receiver_),
+                    record == nullptr ? std::nullopt : std::optional(toModel(*record)));
     }
-    if (kind_ == Kind::instances) {
-        return pass(std::optional<Instance>(), &Consumer::instance, delivery_.instances);
-    }
-    std::optional<ObjectPath> copy;
-    if (record != nullptr) {
-        copy = toModel(*record);
-    }
-    return pass(std::move(copy), &Consumer::path, delivery_.paths);
+    // A null path is an absent entry, of whatever kind.
+    return record == nullptr
+               ? pass(*std::get<ResultReceiver<Instance>*>(receiver_), std::optional<Instance>())
+               : CMPI_RC_ERR_NOT_SUPPORTED;
 }
 
-CMPIrc ResultCollector::add(const CMPIError* error) {
+CMPIrc BrokerResult::add(const CMPIError* error) {
     const ErrorRecord* const record = errorOf(error);
     if (record == nullptr) {
         return CMPI_RC_ERR_INVALID_PARAMETER;
     }
     const std::lock_guard lock(mutex_);
-    if (delivery_.errorMessage.empty() && record->message != nullptr) {
-        delivery_.errorMessage = record->message->view();
+    if (errorMessage_.empty() && record->message != nullptr) {
+        errorMessage_ = record->message->view();
     }
     return CMPI_RC_OK;
 }
 
-void ResultCollector::done() {
+void BrokerResult::done() {
     const std::lock_guard lock(mutex_);
-    ++delivery_.returnDoneCalls;
+    ++returnDoneCalls_;
 }
 
 }  // namespace cimom::broker

@@ -3,50 +3,43 @@
 #include <cmpift.h>
 
 #include <exception>
-#include <functional>
 #include <mutex>
 #include <optional>
 #include <string>
-#include <vector>
+#include <variant>
 
-#include "cimom/Cim.h"
+#include "cimom/Instance.h"
+#include "cimom/ObjectPath.h"
+#include "cimom/ResultReceiver.h"
+#include "cimom/Status.h"
 
 namespace cimom::broker {
 
-/// What a provider delivered during one call. A null path or instance is an
-/// absent entry.
-struct Delivery {
-    std::vector<std::optional<ObjectPath>> paths;
-    std::vector<std::optional<Instance>> instances;
-    unsigned returnDoneCalls = 0;
-    std::string errorMessage;  ///< of the first CMPIError; empty: none
-};
+/// The receiver of a request, for paths or for instances; never null.
+using AnyReceiver = std::variant<ResultReceiver<ObjectPath>*, ResultReceiver<Instance>*>;
 
-/// Who gets what a provider delivers, one by one, in place of a Delivery that
-/// would hold it all. Of the two functions one is set, by the kind of the call.
-struct Consumer {
-    std::function<void(std::optional<ObjectPath>)> path;
-    std::function<void(std::optional<Instance>)> instance;
-};
+[[nodiscard]] inline bool wantsPaths(const AnyReceiver& receiver) noexcept {
+    return std::holds_alternative<ResultReceiver<ObjectPath>*>(receiver);
+}
 
-/// The CMPIResult of one call: it copies what the provider hands over. A
-/// provider's own threads may use it at the same time.
-class ResultCollector {
+/// The CMPIResult of one call: what the provider hands over goes to the receiver as a
+/// copy. A provider's own threads may use it at the same time.
+class BrokerResult {
   public:
-    enum class Kind { paths, instances };
-
-    /// With a consumer, which is borrowed, paths and instances go there, one at a
-    /// time. Once it has thrown, whatever comes is refused.
-    explicit ResultCollector(Kind kind, const Consumer* consumer = nullptr) noexcept;
-    ResultCollector(const ResultCollector&) = delete;
-    ResultCollector& operator=(const ResultCollector&) = delete;
+    /// Borrows the receiver, whose call has begun. Once that has thrown, whatever
+    /// comes is refused.
+    explicit BrokerResult(const AnyReceiver& receiver) noexcept;
+    BrokerResult(const BrokerResult&) = delete;
+    BrokerResult& operator=(const BrokerResult&) = delete;
 
     [[nodiscard]] const CMPIResult* record() const noexcept { return &record_; }
-    /// What was delivered; the collector is empty afterwards.
-    [[nodiscard]] Delivery take();
-    /// What the consumer threw; null: nothing.
+    /// What the receiver threw; null: nothing.
     [[nodiscard]] std::exception_ptr failure() const;
+    [[nodiscard]] unsigned returnDoneCalls() const;
+    /// Of the first CMPIError; empty: none.
+    [[nodiscard]] std::string errorMessage() const;
 
+    // What the table's functions do; null is an absent entry.
     CMPIrc add(const CMPIInstance* instance);
     CMPIrc add(const CMPIObjectPath* path);
     CMPIrc add(const CMPIError* error);
@@ -54,15 +47,13 @@ class ResultCollector {
 
   private:
     template <typename Object>
-    CMPIrc pass(std::optional<Object> object,
-                std::function<void(std::optional<Object>)> Consumer::*receive,
-                std::vector<std::optional<Object>>& kept);
+    CMPIrc pass(ResultReceiver<Object>& receiver, std::optional<Object> object);
 
-    const Kind kind_;
-    const Consumer* const consumer_;
+    const AnyReceiver receiver_;
     CMPIResult record_;
     mutable std::mutex mutex_;
-    Delivery delivery_;
+    unsigned returnDoneCalls_ = 0;
+    std::string errorMessage_;
     std::exception_ptr failure_;
 };
 

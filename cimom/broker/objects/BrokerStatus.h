@@ -13,7 +13,7 @@ namespace cimom::broker {
 }
 
 /// The caller's status is an optional output; when present, both members are written.
-inline void answer(CMPIStatus* rc, CMPIrc code, CMPIString* message = nullptr) noexcept {
+inline void setStatus(CMPIStatus* rc, CMPIrc code, CMPIString* message = nullptr) noexcept {
     if (rc != nullptr) {
         *rc = {code, message};
     }
@@ -21,7 +21,7 @@ inline void answer(CMPIStatus* rc, CMPIrc code, CMPIString* message = nullptr) n
 
 /// Runs the body of a broker function that gives a status. No exception of ours
 /// may reach the provider, which may be written in C. What unwinds a cancelled
-/// thread is no std::exception and passes.
+/// thread is not a std::exception and passes.
 template <typename Body>
 CMPIStatus guarded(Body&& body) {
     try {
@@ -39,10 +39,10 @@ Result guarded(CMPIStatus* rc, Result failure, Body&& body) {
     try {
         CMPIrc code = CMPI_RC_OK;
         Result result = std::forward<Body>(body)(code);
-        answer(rc, code);
+        setStatus(rc, code);
         return code == CMPI_RC_OK ? result : failure;
     } catch (const std::exception&) {
-        answer(rc, CMPI_RC_ERR_FAILED);
+        setStatus(rc, CMPI_RC_ERR_FAILED);
         return failure;
     }
 }

@@ -3,6 +3,7 @@
 #include <cstring>
 
 #include "broker/objects/BrokerStatus.h"
+#include "cimom/Status.h"
 
 namespace cimom::broker {
 
@@ -39,10 +40,10 @@ CMPIString* clone(const CMPIString* self, CMPIStatus* rc) {
 
 const char* getCharPtr(const CMPIString* self, CMPIStatus* rc) {
     if (!isOurs(self)) {
-        answer(rc, CMPI_RC_ERR_INVALID_HANDLE);
+        setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE);
         return nullptr;
     }
-    answer(rc, CMPI_RC_OK);
+    setStatus(rc, CMPI_RC_OK);
     return static_cast<const char*>(self->hdl);
 }
 

@@ -8,7 +8,6 @@
 #include "broker/objects/BrokerInstance.h"
 #include "broker/objects/BrokerObjectPath.h"
 #include "broker/objects/BrokerStatus.h"
-#include "cimom/Cim.h"
 
 namespace cimom::broker {
 
@@ -180,10 +179,11 @@ CMPIData dataByName(const EntryList& entries, const char* name, CMPIValueState e
                     CMPIStatus* rc) noexcept {
     const Entry* const entry = name == nullptr ? nullptr : entries.find(name);
     if (entry == nullptr) {
-        answer(rc, name == nullptr ? CMPI_RC_ERR_INVALID_PARAMETER : CMPI_RC_ERR_NO_SUCH_PROPERTY);
+        setStatus(rc,
+                  name == nullptr ? CMPI_RC_ERR_INVALID_PARAMETER : CMPI_RC_ERR_NO_SUCH_PROPERTY);
         return missingData();
     }
-    answer(rc, CMPI_RC_OK);
+    setStatus(rc, CMPI_RC_OK);
     CMPIData data = entry->data;
     data.state = static_cast<CMPIValueState>(data.state | extraState);
     return data;
@@ -195,14 +195,14 @@ CMPIData dataAt(const EntryList& entries, CMPICount index, CMPIValueState extraS
         if (name != nullptr) {
             *name = nullptr;
         }
-        answer(rc, CMPI_RC_ERR_NO_SUCH_PROPERTY);
+        setStatus(rc, CMPI_RC_ERR_NO_SUCH_PROPERTY);
         return missingData();
     }
     const Entry& entry = entries[index];
     if (name != nullptr) {
         *name = entry.name;
     }
-    answer(rc, CMPI_RC_OK);
+    setStatus(rc, CMPI_RC_OK);
     CMPIData data = entry.data;
     data.state = static_cast<CMPIValueState>(data.state | extraState);
     return data;

@@ -6,6 +6,7 @@
 
 #include "broker/Arena.h"
 #include "broker/objects/BrokerString.h"
+#include "cimom/Status.h"
 #include "model/NameKey.h"
 
 namespace cimom::broker {
@@ -15,7 +16,7 @@ namespace cimom::broker {
 /// "value" pointer is the text pointer itself) becomes a CMPI_string. A null
 /// pointer, outside or inside, is a null value of the type.
 ///
-/// OK, CMPI_RC_ERR_INVALID_DATA_TYPE for a type that is no CIM type, or
+/// OK, CMPI_RC_ERR_INVALID_DATA_TYPE for a type that is not a CIM type, or
 /// CMPI_RC_ERR_INVALID_HANDLE for an object that this broker did not make.
 CMPIrc copyValue(Arena& arena, const CMPIValue* value, CMPIType type, CMPIData& copy);
 
@@ -63,7 +64,7 @@ class EntryList {
     CMPICount capacity_ = 0;
 };
 
-/// What a getter by name answers: the data with `extraState`, or the data and
+/// What a getter by name gives: the data with `extraState`, or the data and
 /// status of a missing one.
 CMPIData dataByName(const EntryList& entries, const char* name, CMPIValueState extraState,
                     CMPIStatus* rc) noexcept;

@@ -1,66 +1,15 @@
 #pragma once
 
-#include <cstddef>
-#include <cstdint>
 #include <filesystem>
 #include <memory>
-#include <optional>
-#include <stdexcept>
 #include <string>
 #include <string_view>
 #include <vector>
 
-#include "cimom/Cim.h"
+#include "cimom/ClassDeclaration.h"
+#include "cimom/MofError.h"
 
 namespace cimom {
-
-struct Qualifier {
-    std::string name;
-    Value value;
-    bool overridable = true;  ///< flavor EnableOverride
-    bool toSubclass = true;   ///< flavor ToSubclass, else Restricted
-    bool translatable = false;
-
-    bool operator==(const Qualifier&) const = default;
-};
-
-struct PropertyDeclaration {
-    std::string name;
-    Type type = Type::string;
-    bool isArray = false;
-    std::optional<std::uint32_t> arraySize;
-    std::string referenceClass;         ///< for references, else empty
-    Value defaultValue;                 ///< null when none is declared; passed to overrides
-    std::vector<Qualifier> qualifiers;  ///< effective ones: declared and inherited
-    std::string classOrigin;            ///< the class that introduced the property
-    bool propagated = false;            ///< not declared in this class itself
-
-    [[nodiscard]] const Qualifier* qualifier(std::string_view qualifierName) const noexcept;
-    [[nodiscard]] bool isKey() const noexcept;
-};
-
-/// A class with everything that it inherits resolved.
-struct ClassDeclaration {
-    std::string name;
-    std::string superclass;  ///< empty for a root
-    std::vector<Qualifier> qualifiers;
-    std::vector<PropertyDeclaration> properties;  ///< inherited first, root downwards
-
-    [[nodiscard]] const PropertyDeclaration* property(std::string_view propertyName) const noexcept;
-    [[nodiscard]] const Qualifier* qualifier(std::string_view qualifierName) const noexcept;
-    [[nodiscard]] bool isAssociation() const noexcept;
-};
-
-/// A MOF file that cannot be used. what() is "FILE:LINE:COLUMN: REASON"; line
-/// and column count from 1, columns in bytes.
-class MofError : public std::runtime_error {
-  public:
-    MofError(std::string file, std::size_t line, std::size_t column, const std::string& reason);
-
-    const std::string file;
-    const std::size_t line;
-    const std::size_t column;
-};
 
 /// The classes that the object manager knows. Filled once, then only read, from
 /// any thread.

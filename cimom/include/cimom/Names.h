@@ -4,8 +4,6 @@
 #include <cstdint>
 #include <string_view>
 
-#include "cimom/Cim.h"
-
 namespace cimom {
 
 /// ASCII lower case, without the locale on which tolower depends.
@@ -22,6 +20,9 @@ namespace cimom {
 [[nodiscard]] constexpr bool isNamePart(char letter) noexcept {
     return isNameStart(letter) || isDigit(letter);
 }
+
+/// Names compare without regard to case (ASCII).
+[[nodiscard]] bool sameName(std::string_view a, std::string_view b) noexcept;
 
 /// FNV-1a over the lower-cased name. With NameEqual it lets hashed containers
 /// find names without regard to case and without a copy.

@@ -1,14 +1,15 @@
 #pragma once
 
+#include <optional>
 #include <stdexcept>
 #include <string>
 #include <string_view>
 
-#include "cimom/Cim.h"
+#include "cimom/ObjectPath.h"
 
 namespace cimom {
 
-/// A text that is no object path; what() tells what is wrong and where.
+/// A text that is not an object path; what() tells what is wrong and where.
 class ObjectPathError : public std::runtime_error {
   public:
     using std::runtime_error::runtime_error;
@@ -23,5 +24,9 @@ class ObjectPathError : public std::runtime_error {
 /// Writes that form, keys in their order; no host, no leading slash:
 /// root/cimv2:QVXZR_DHCPSettingData.InstanceID="Computer%eth0".
 [[nodiscard]] std::string toText(const ObjectPath& path);
+
+/// The text that a key's value has in that form: "old \"x\"", 42, 1.5, TRUE, and the
+/// quoted text of a reference. Nothing for null and embedded instances.
+[[nodiscard]] std::optional<std::string> scalarText(const Scalar& scalar);
 
 }  // namespace cimom

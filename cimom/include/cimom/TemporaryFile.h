@@ -7,7 +7,7 @@ namespace cimom {
 
 /// Room on disk for what would be too much for the memory of this process: a file
 /// without a name in the directory for temporary files (TMPDIR, else /tmp), which
-/// ends with the object. Reading from several threads is safe while nobody writes.
+/// ends with the object. Reading from several threads is safe while no thread writes.
 class TemporaryFile {
   public:
     /// Throws std::system_error, which names the directory.

@@ -10,7 +10,7 @@ namespace cimom {
     return character >= 0xD800 && character <= 0xDFFF;
 }
 
-/// Appends a character in UTF-8. What is no Unicode scalar value (a lone
+/// Appends a character in UTF-8. What is not a Unicode scalar value (a lone
 /// surrogate, say) becomes U+FFFD, so that the text stays valid.
 void appendUtf8(std::string& text, char32_t character);
 

@@ -107,7 +107,7 @@ TEST_F(RemoteServer, RefusesWhatIsNotAResponse) {
                                   "<IRETURNVALUE><INSTANCE CLASSNAME='A'><PROPERTY NAME='n' "
                                   "TYPE='uint8'><VALUE>-1</VALUE></PROPERTY></INSTANCE>"
                                   "</IRETURNVALUE>")),
-              "a value in the response is not valid: n: \"-1\" is no uint8");
+              "a value in the response is not valid: n: \"-1\" is not of type uint8");
     std::string deep;
     for (int depth = 0; depth < 100000; ++depth) {
         deep += "<a>";

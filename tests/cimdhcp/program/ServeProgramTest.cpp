@@ -185,7 +185,8 @@ TEST_F(Serve, UsersHaveToSayWhoTheyAre) {
     EXPECT_EQ(modify("ada:pass-ada@", "office"), 0);
     EXPECT_EQ(ZR::Testing::readFile(configuration("eth0")), "CONFIG_NAME=office\n");
     const std::string logged = log();
-    EXPECT_THAT(logged, HasSubstr("refused nobody from 127.0.0.1, refusal number 1"));
+    EXPECT_THAT(logged,
+                HasSubstr("refused a client without credentials from 127.0.0.1, refusal number 1"));
     EXPECT_THAT(logged, HasSubstr("refused user ada from 127.0.0.1, refusal number 2"));
     EXPECT_THAT(logged, HasSubstr("modify user=\"bob\""));
     EXPECT_THAT(logged, HasSubstr("status=CIM_ERR_ACCESS_DENIED"));
@@ -244,7 +245,7 @@ TEST_F(Serve, RefusesToStartWhereItWouldBeOpenToAll) {
               (Ended{2, "", "cimdhcp: --request-timeout is 0; it may be 1 to 86400\n"}));
     EXPECT_EQ(refusal({"--listen", "127.0.0.1:http"}).status, 2);
     EXPECT_EQ(refusal({"--listen", "localhost"}),
-              (Ended{3, "", "cimdhcp: \"localhost\" is no IPv4 or IPv6 address\n"}));
+              (Ended{3, "", "cimdhcp: \"localhost\" is not an IPv4 or IPv6 address\n"}));
 }
 
 TEST_F(Serve, LimitsAreSetByOptions) {

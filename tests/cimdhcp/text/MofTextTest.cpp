@@ -5,6 +5,7 @@
 #include <limits>
 #include <memory>
 
+#include "cimom/Instance.h"
 #include "cimom/ObjectPathText.h"
 
 namespace cimdhcp {

@@ -27,7 +27,7 @@ TEST_F(BrokerThreads, AttachedThreadHasMemoryUntilItDetaches) {
     }).join();
 }
 
-TEST_F(BrokerThreads, PreparedContextThatNobodyUsesGoesWithTheBroker) {
+TEST_F(BrokerThreads, UnusedPreparedContextEndsWithTheBroker) {
     EXPECT_NE(mb->bft->prepareAttachThread(mb, context), nullptr);
 }
 

@@ -10,7 +10,7 @@ namespace {
 class Conversion : public TestBroker {
   protected:
     void expectSurvives(const Value& value) {
-        EXPECT_EQ(broker::toModel(broker::toData(scope.arena(), &schema, value)), value)
+        EXPECT_EQ(broker::toModel(broker::toData(scope.arena(), &repository, value)), value)
             << typeName(value.type);
     }
 };
@@ -60,7 +60,7 @@ TEST_F(Conversion, ValueOutsideOfItsTypeIsRefused) {
         {Type::boolean, true, Array{true, std::string("x")}},
     };
     for (const Value& value : values) {
-        EXPECT_THROW(static_cast<void>(broker::toData(scope.arena(), &schema, value)),
+        EXPECT_THROW(static_cast<void>(broker::toData(scope.arena(), &repository, value)),
                      broker::ConversionError)
             << typeName(value.type);
     }
@@ -70,22 +70,22 @@ TEST_F(Conversion, RefusalNamesThePropertyAndTheValue) {
     const Instance instance{{"", "", "Test_Types", {}},
                             {{"Uint8", {Type::uint8, false, Scalar(std::uint64_t{300})}}}};
     try {
-        static_cast<void>(broker::toRecord(scope.arena(), &schema, instance));
+        static_cast<void>(broker::toRecord(scope.arena(), &repository, instance));
         FAIL();
     } catch (const broker::ConversionError& error) {
-        EXPECT_STREQ(error.what(), "Uint8: 300 is no uint8");
+        EXPECT_STREQ(error.what(), "Uint8: 300 is not of type uint8");
     }
 }
 
 TEST_F(Conversion, NullKeysAreLeftOut) {
     const ObjectPath path{"", "root/test", "Test_Left", {{"Id", Value::null(Type::string, false)}}};
-    EXPECT_EQ(broker::toRecord(scope.arena(), &schema, path)->keys.size(), 0U);
+    EXPECT_EQ(broker::toRecord(scope.arena(), &repository, path)->keys.size(), 0U);
 }
 
 TEST_F(Conversion, EmbeddedInstanceMayStandInATextProperty) {
     const auto inner = std::make_shared<const Instance>(Instance{{"", "", "Test_Inner", {}}, {}});
     const CMPIData data =
-        broker::toData(scope.arena(), &schema, {Type::string, false, Scalar(inner)});
+        broker::toData(scope.arena(), &repository, {Type::string, false, Scalar(inner)});
     EXPECT_EQ(data.type, CMPI_instance);
 }
 

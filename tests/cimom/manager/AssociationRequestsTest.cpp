@@ -77,7 +77,7 @@ TEST_F(AssociationRequests, AssociationClassIsTheProvidersMatter) {
                 ElementsAre("Test_Right.Id=\"r1\"", "Test_RightSpecial.Id=\"s1\""));
 }
 
-TEST_F(AssociationRequests, UnknownAssociationClassIsAnsweredByTheProvider) {
+TEST_F(AssociationRequests, UnknownAssociationClassIsLeftToTheProvider) {
     const AssociationRequest unknown = request("Nobody_Knows", none, none, none);
     EXPECT_EQ(manager.associators(l1, unknown).status.code, CMPI_RC_ERR_INVALID_CLASS);
     const PathsResult paths = manager.associatorNames(l1, unknown);

@@ -51,7 +51,7 @@ TEST_F(InstanceRequests, UnknownNamespaceAndClassAreTold) {
               CMPI_RC_ERR_INVALID_CLASS);
 }
 
-TEST_F(InstanceRequests, KnownClassThatNobodyServesHasNoInstances) {
+TEST_F(InstanceRequests, KnownClassWithoutProviderHasNoInstances) {
     const PathsResult paths = manager.enumerateInstanceNames(path("Test_Unserved"));
     EXPECT_EQ(paths.status, Status{});
     EXPECT_TRUE(paths.paths.empty());
@@ -69,7 +69,7 @@ TEST_F(InstanceRequests, ClassIsServedInItsNamespacesOnly) {
         manager.enumerateInstances(parseObjectPath("root/other:Test_Left")).instances.empty());
 }
 
-TEST_F(InstanceRequests, AnswersHaveHostAndNamespace) {
+TEST_F(InstanceRequests, ResultsHaveHostAndNamespace) {
     const PathsResult result = manager.enumerateInstanceNames(path("Test_Numbered"));
     ASSERT_EQ(result.paths.size(), 3U);
     EXPECT_EQ(result.paths[0]->host, "testhost");
@@ -194,7 +194,7 @@ TEST_F(InstanceRequests, ModifyWithAnImpossibleValueIsRefused) {
     const Instance changed{path("Test_Left.Id=\"l1\""),
                            {{"Size", {Type::uint8, false, Scalar(std::uint64_t{256})}}}};
     EXPECT_EQ(manager.modifyInstance(changed).status,
-              (Status{CMPI_RC_ERR_INVALID_PARAMETER, "Size: 256 is no uint8"}));
+              (Status{CMPI_RC_ERR_INVALID_PARAMETER, "Size: 256 is not of type uint8"}));
 }
 
 }  // namespace

@@ -6,9 +6,9 @@
 namespace cimom::test {
 namespace {
 
-using Concurrency = TestManager;
+using ManagerConcurrency = TestManager;
 
-TEST_F(Concurrency, SixteenThreadsGetTheirAnswers) {
+TEST_F(ManagerConcurrency, SixteenThreadsGetTheirResults) {
     std::atomic<int> wrong{0};
     const auto work = [&](int number) {
         for (int round = 0; round < 50; ++round) {
@@ -44,7 +44,7 @@ TEST_F(Concurrency, SixteenThreadsGetTheirAnswers) {
     EXPECT_EQ(wrong, 0);
 }
 
-TEST_F(Concurrency, FirstRequestsAtOnceCreateTheProviderOnce) {
+TEST_F(ManagerConcurrency, FirstRequestsAtOnceCreateTheProviderOnce) {
     std::vector<std::thread> threads;
     for (int number = 0; number < 16; ++number) {
         threads.emplace_back(

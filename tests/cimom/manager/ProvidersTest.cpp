@@ -99,7 +99,7 @@ TEST_F(BadProviders, ResultEndsWhenTheSlotReturns) {
 
 /// Counts what comes, and throws at the object of a number.
 template <typename Object>
-class Counter : public Receiver<Object> {
+class Counter : public ResultReceiver<Object> {
   public:
     explicit Counter(std::size_t last) : last_(last) {}
     void take(std::optional<Object> /*object*/) override {
@@ -108,16 +108,17 @@ class Counter : public Receiver<Object> {
         }
         ++count;
     }
-    std::size_t mark() override { return count; }
-    void backTo(std::size_t mark) override { count = mark; }
+    void beginCall() override { before_ = count; }
+    void dropCall() override { count = before_; }
 
     std::size_t count = 0;
 
   private:
     std::size_t last_;
+    std::size_t before_ = 0;
 };
 
-TEST_F(BadProviders, AMillionResultsAreHeldByNobody) {
+TEST_F(BadProviders, AMillionObjectsAreNotHeldAtOnce) {
     const ObjectPath million = parseObjectPath("root/test:Test_Million");
     Counter<ObjectPath> paths(2'000'000);
     EXPECT_EQ(manager.enumerateInstanceNames(million, {}, paths).status, Status{});
@@ -210,9 +211,8 @@ TEST(ProviderUnloading, ThousandLoadsAndUnloadsLeaveNothingBehind) {
     };
     ClassRepository repository;
     repository.load(BROKER_TEST_DIR "/schema/Test.mof");
-    const broker::Schema schema(repository);
     const auto once = [&] {
-        Providers providers({BROKER_PROVIDER_DIR}, schema, nullptr);
+        Providers providers({BROKER_PROVIDER_DIR}, repository, nullptr);
         Status status;
         EXPECT_NE(providers.provider("TestProvider", "Test").instance("root/test", status),
                   nullptr);

@@ -75,15 +75,15 @@ TEST_F(Registrations, ErrorsTellFileLineAndReason) {
     EXPECT_EQ(failure("provider: x\n"), "1: the line stands before the first [CLASS]");
     EXPECT_EQ(failure("\n[A B]\n"), "2: a section begins with [CLASS], not with \"[A B]\"");
     EXPECT_EQ(failure("[A\n"), "1: a section begins with [CLASS], not with \"[A\"");
-    EXPECT_EQ(failure("[A]\nprovider\n"), "2: \"provider\" is no line of the form KEY: VALUE");
+    EXPECT_EQ(failure("[A]\nprovider\n"), "2: \"provider\" is not a line of the form KEY: VALUE");
     EXPECT_EQ(failure("[A]\nprovider:\n"), "2: \"provider:\" has no value");
     EXPECT_EQ(failure("[A]\ncolour: red\n"), "2: \"colour:\" is unknown");
     EXPECT_EQ(failure("[A]\nprovider: a\nprovider: b\n"), "3: \"provider:\" is given twice");
     EXPECT_EQ(failure("[A]\ntype: instance\ntype: instance\n"), "3: \"type:\" is given twice");
-    EXPECT_EQ(failure("[A]\ntype: everything\n"), "2: \"everything\" is no type of provider");
+    EXPECT_EQ(failure("[A]\ntype: everything\n"), "2: \"everything\" is not a type of provider");
     EXPECT_EQ(failure("[A]\nlocation: ../x\n"),
-              "2: \"../x\" is no name for \"location:\": blanks and \"/\" cannot be in it");
-    EXPECT_EQ(failure("[A]\nnamespace: /\n"), "2: \"/\" is no namespace");
+              "2: \"../x\" is not a name for \"location:\": blanks and \"/\" cannot be in it");
+    EXPECT_EQ(failure("[A]\nnamespace: /\n"), "2: \"/\" is not a namespace");
     EXPECT_EQ(failure("[A]\nlocation: L\ntype: instance\nnamespace: n\n"),
               "1: [A] has no line \"provider:\"");
     EXPECT_EQ(failure("[A]\nprovider: P\nlocation: L\nnamespace: n\n[B]\n"),

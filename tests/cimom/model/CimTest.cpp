@@ -1,6 +1,9 @@
-#include "cimom/Cim.h"
 
 #include <gtest/gtest.h>
+
+#include "cimom/Instance.h"
+#include "cimom/Names.h"
+#include "cimom/Status.h"
 
 namespace cimom {
 namespace {

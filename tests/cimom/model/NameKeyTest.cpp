@@ -5,7 +5,7 @@
 #include <set>
 #include <string>
 
-using cimom::broker::NameKey;
+using cimom::NameKey;
 
 TEST(NameKey, CasesOfANameHaveOneHash) {
     const NameKey key("SystemCreationClassName");

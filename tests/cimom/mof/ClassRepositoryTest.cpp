@@ -22,7 +22,7 @@ class ClassRepositoryTest : public testing::Test {
         directory_ = ::mkdtemp(name.data());
     }
     ~ClassRepositoryTest() override {
-        std::error_code ignored;  // a leftover in the temporary directory harms nobody
+        std::error_code ignored;  // a leftover in the temporary directory does no harm
         std::filesystem::remove_all(directory_, ignored);
     }
 
@@ -120,7 +120,7 @@ TEST_F(ClassRepositoryTest, ANarrowedReferenceToALaterClassIsCheckedInTheEnd) {
     repository_.loadText("class A_M : A_L { [Override(\"L\")]\n A_Y REF L; };", "m.mof");
     repository_.loadText("class A_Y { };", "t");
     EXPECT_EQ(errorOf([&] { repository_.complete(); }),
-              "m.mof:2:2: A_Y is no subclass of A_X, which the superclass references");
+              "m.mof:2:2: A_Y is not a subclass of A_X, which the superclass references");
 }
 
 TEST_F(ClassRepositoryTest, WhatCameBeforeAnErrorStays) {
@@ -149,7 +149,7 @@ TEST_F(ClassRepositoryTest, ErrorsNameTheFileTheLineAndTheColumn) {
         repository_.load(file);
         FAIL();
     } catch (const MofError& error) {
-        EXPECT_EQ(error.what(), file.string() + ":2:4: \"text\" is no type");
+        EXPECT_EQ(error.what(), file.string() + ":2:4: \"text\" is not a type");
         EXPECT_EQ(error.file, file.string());
         EXPECT_EQ(error.line, 2U);
         EXPECT_EQ(error.column, 4U);

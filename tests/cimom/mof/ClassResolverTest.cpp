@@ -2,6 +2,8 @@
 
 #include <gtest/gtest.h>
 
+#include "cimom/ClassRepository.h"
+
 namespace cimom {
 namespace {
 
@@ -201,17 +203,17 @@ INSTANTIATE_TEST_SUITE_P(
         WrongClass{"[Association] class T_A { T_Root REF One[]; T_Root REF Two; };",
                    "1:38: reference One cannot be an array"},
         WrongClass{"class T_A : T_Link {\n  [Override(\"Left\")]\n  T_Other REF Left;\n};",
-                   "3:3: T_Other is no subclass of T_Keyed, which the superclass references"},
+                   "3:3: T_Other is not a subclass of T_Keyed, which the superclass references"},
         WrongClass{"class T_A : T_Link { [Override(\"Left\")] T_Root REF Left; };",
-                   "1:41: T_Root is no subclass of T_Keyed, which the superclass references"},
+                   "1:41: T_Root is not a subclass of T_Keyed, which the superclass references"},
         WrongClass{"class T_A { uint8 P = 256; };", "1:23: 256 does not fit uint8"},
         WrongClass{"class T_A { uint8 P[] = 1; };", "1:25: a list in braces is needed here"},
         WrongClass{"class T_A { uint8 P = { 1 }; };", "1:23: one value is needed here, not a list"},
         WrongClass{"class T_A { datetime P = \"now\"; };",
-                   "1:26: this is no value of type datetime"},
+                   "1:26: this is not a value of type datetime"},
         WrongClass{"Qualifier key : boolean, Scope(any);", "1:11: qualifier key is declared twice"},
         WrongClass{"Qualifier New : uint8 = TRUE, Scope(any);",
-                   "1:25: this is no value of type uint8"}));
+                   "1:25: this is not a value of type uint8"}));
 
 }  // namespace
 }  // namespace cimom

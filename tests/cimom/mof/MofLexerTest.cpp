@@ -142,7 +142,7 @@ TEST(MofLexer, RefusesMalformedNumbers) {
     for (const std::string text :
          {"-", "+-1", "12a", "0x", "08", "1b2", "12b", "1.", "1.e5", "1.2.3", "1.5e", "."}) {
         const std::string written = text == "+-1" ? "+" : text;
-        EXPECT_EQ(errorOf(text), "file.mof:1:1: \"" + written + "\" is no number");
+        EXPECT_EQ(errorOf(text), "file.mof:1:1: \"" + written + "\" is not a number");
     }
     EXPECT_EQ(errorOf("18446744073709551616"),
               "file.mof:1:1: \"18446744073709551616\" does not fit 64 bits");

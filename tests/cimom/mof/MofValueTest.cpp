@@ -81,7 +81,7 @@ TEST(MofValue, DatetimesHaveTheirTwentyFiveCharacters) {
     for (const char* bad : {"", "2024", "20240131093000.000000+06*", "20240131093000,000000+060",
                             "20240131093000.000000x060", "2024013109300a.000000+060"}) {
         EXPECT_EQ(errorOf(one(std::string(bad)), Type::datetime),
-                  "f:3:5: this is no value of type datetime");
+                  "f:3:5: this is not a value of type datetime");
     }
 }
 
@@ -102,19 +102,20 @@ TEST(MofValue, ListsAreForArraysAndTheirElementsMayBeNull) {
     EXPECT_EQ(errorOf(list, Type::uint8), "f:3:9: one value is needed here, not a list");
     EXPECT_EQ(errorOf(one(integer(1)), Type::uint8, true),
               "f:3:5: a list in braces is needed here");
-    EXPECT_EQ(errorOf(list, Type::string, true), "f:4:1: this is no value of type string");
+    EXPECT_EQ(errorOf(list, Type::string, true), "f:4:1: this is not a value of type string");
 }
 
 TEST(MofValue, ValuesOfAnotherTypeAreRefused) {
-    EXPECT_EQ(errorOf(one(true), Type::uint8), "f:3:5: this is no value of type uint8");
-    EXPECT_EQ(errorOf(one(1.5), Type::uint8), "f:3:5: this is no value of type uint8");
-    EXPECT_EQ(errorOf(one(integer(1)), Type::string), "f:3:5: this is no value of type string");
-    EXPECT_EQ(errorOf(one(integer(1)), Type::boolean), "f:3:5: this is no value of type boolean");
+    EXPECT_EQ(errorOf(one(true), Type::uint8), "f:3:5: this is not a value of type uint8");
+    EXPECT_EQ(errorOf(one(1.5), Type::uint8), "f:3:5: this is not a value of type uint8");
+    EXPECT_EQ(errorOf(one(integer(1)), Type::string), "f:3:5: this is not a value of type string");
+    EXPECT_EQ(errorOf(one(integer(1)), Type::boolean),
+              "f:3:5: this is not a value of type boolean");
     EXPECT_EQ(errorOf(one(std::string("a")), Type::char16),
-              "f:3:5: this is no value of type char16");
-    EXPECT_EQ(errorOf(one(u'a'), Type::string), "f:3:5: this is no value of type string");
+              "f:3:5: this is not a value of type char16");
+    EXPECT_EQ(errorOf(one(u'a'), Type::string), "f:3:5: this is not a value of type string");
     EXPECT_EQ(errorOf(one(std::string("a")), Type::real32),
-              "f:3:5: this is no value of type real32");
+              "f:3:5: this is not a value of type real32");
     EXPECT_EQ(errorOf(one(1e39), Type::real32), "f:3:5: this number does not fit real32");
     EXPECT_EQ(errorOf(one(std::string("X.A=1")), Type::reference),
               "f:3:5: a reference can have no default value but NULL");

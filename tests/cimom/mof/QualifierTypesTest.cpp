@@ -1,3 +1,4 @@
+#include "cimom/MofError.h"
 #include "mof/QualifierTypes.h"
 
 #include <gtest/gtest.h>
@@ -69,7 +70,7 @@ TEST_F(QualifierTypesTest, RefusesWhatIsUnknownMisplacedDoubledOrOfAnotherType) 
               }),
               "f.mof:7:9: qualifier TEXT is given twice");
     EXPECT_EQ(errorOf([&] { resolve({written("Key", MofConstant(std::string("x")))}); }),
-              "f.mof:7:12: this is no value of type boolean");
+              "f.mof:7:12: this is not a value of type boolean");
     EXPECT_EQ(errorOf([&] {
                   resolve({written("Key", std::nullopt, {true, {}, {}})});
               }),

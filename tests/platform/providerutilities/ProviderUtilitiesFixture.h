@@ -8,7 +8,6 @@
 #include "broker/Broker.h"
 #include "broker/RequestScope.h"
 #include "cimom/ClassRepository.h"
-#include "mof/Schema.h"
 
 namespace ZR::Testing {
 
@@ -84,8 +83,7 @@ class TestBroker : public testing::Test {
     }
 
     cimom::ClassRepository repository_ = load();
-    cimom::broker::Schema schema_{repository_};
-    cimom::broker::Broker broker_{schema_};
+    cimom::broker::Broker broker_{repository_};
     cimom::broker::RequestScope scope_;
 
   protected:

@@ -127,7 +127,7 @@ TEST_F(CMPIDHCPSettingDataTest, ModifyOfAMissingSettingTouchesNoFile) {
 TEST_F(CMPIDHCPSettingDataTest, AdapterOnNothingWritesNothing) {
     writeFile(file("eth0"), "CONFIG_NAME=old\n");
     Host::Answer answer = host_.request(
-        cimom::broker::ResultCollector::Kind::instances, pathOfSetting("Computer%eth9"),
+        Host::Kind::instances, pathOfSetting("Computer%eth9"),
         [&](auto* context, auto* /*result*/, auto* path) {
             ZR::DHCPClientProvider::CMPIDHCPSettingData adapter(host_.broker(), context, path);
             EXPECT_FALSE(static_cast<bool>(adapter));

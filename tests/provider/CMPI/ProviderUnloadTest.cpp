@@ -33,8 +33,7 @@ TEST_F(UnloadTest, AThousandLoadsLoseNoDescriptor) {
         // milliseconds; a request now and then is enough to lose something.
         if (load % 50 == 0) {
             const test::Host::Answer answer =
-                host.request(cimom::broker::ResultCollector::Kind::paths,
-                             test::pathOf("QVXZR_DHCPProtocolEndpoint"),
+                host.request(test::Host::Kind::paths, test::pathOf("QVXZR_DHCPProtocolEndpoint"),
                              [mi](auto* context, auto* result, auto* path) {
                                  return mi->ft->enumerateInstanceNames(mi, context, result, path);
                              });

@@ -148,15 +148,14 @@ TEST_F(AssociationsTest, StandardParentRunsTheSecondAlsoWhenTheSourceTakesNoPart
 
 TEST_F(AssociationsTest, RolesChangeNothing) {
     const auto withRoles = [this](const char* role, const char* resultRole) {
-        return host_.request(cimom::broker::ResultCollector::Kind::paths, endpoint("eth0"),
-                             [&](auto* context, auto* result, auto* path) {
-                                 return host_.associationTable().associatorNames(
-                                     nullptr, context, result, path, hosted, nullptr, role,
-                                     resultRole);
-                             });
+        return host_.request(
+            Host::Kind::paths, endpoint("eth0"), [&](auto* context, auto* result, auto* path) {
+                return host_.associationTable().associatorNames(nullptr, context, result, path,
+                                                                hosted, nullptr, role, resultRole);
+            });
     };
     const auto referencesWithRole = [this](const char* role) {
-        return host_.request(cimom::broker::ResultCollector::Kind::paths, endpoint("eth0"),
+        return host_.request(Host::Kind::paths, endpoint("eth0"),
                              [&](auto* context, auto* result, auto* path) {
                                  return host_.associationTable().referenceNames(
                                      nullptr, context, result, path, hosted, role);

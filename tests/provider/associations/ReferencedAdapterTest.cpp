@@ -45,7 +45,7 @@ class ReferencedAdapterTest : public test::TreeTest {
     /// Runs something with an adapter in a request for a path.
     template <typename Adapter, typename Use>
     void with(const char* path, const Use& use) {
-        host_.request(cimom::broker::ResultCollector::Kind::paths, pathFrom(path),
+        host_.request(Host::Kind::paths, pathFrom(path),
                       [&](auto* context, auto* /*result*/, auto* record) {
                           Adapter adapter(host_.broker(), context, "root/cimv2");
                           use(adapter, record);

@@ -50,7 +50,7 @@ TEST(Call, PassesOverCorrelators) {
         "none");
 }
 
-TEST(Call, AnswersWhatTheStandardHasForBadBodies) {
+TEST(Call, BadBodiesFailAsTheStandardSays) {
     EXPECT_EQ(failureOf("<CIM"), "400 request-not-well-formed: line 1: unclosed token");
     EXPECT_EQ(failureOf("<HTML/>"), "400 request-not-valid: element HTML where CIM belongs");
     EXPECT_EQ(failureOf("<!DOCTYPE CIM><CIM/>"),
@@ -83,11 +83,11 @@ TEST(Call, WritesErrorsThatNameTheirStatus) {
     Call call;
     call.messageId = "<1>";
     call.method = "GetInstance";
-    const std::string body = errorAnswer(call, 6, "");
+    const std::string body = errorResponse(call, 6, "");
     const XmlElement cim = test::checked(body);
     EXPECT_EQ(*cim.children.at(0).attribute("ID"), "<1>");
     EXPECT_NE(body.find(R"(<ERROR CODE="6" DESCRIPTION="CIM_ERR_NOT_FOUND"/>)"), std::string::npos);
-    EXPECT_NE(errorAnswer(call, 21, "").find("CIM_ERR_INVALID_ENUMERATION_CONTEXT"),
+    EXPECT_NE(errorResponse(call, 21, "").find("CIM_ERR_INVALID_ENUMERATION_CONTEXT"),
               std::string::npos);
 }
 

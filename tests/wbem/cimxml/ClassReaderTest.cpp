@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include "cimom/ClassRepository.h"
 #include "cimxml/Errors.h"
 #include "cimxml/ObjectWriter.h"
 

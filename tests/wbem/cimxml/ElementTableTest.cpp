@@ -8,7 +8,7 @@ namespace cimom::test {
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 
-// The table judges every answer of the other tests: it must be able to refuse.
+// The table judges every response in the other tests: it must be able to refuse.
 
 std::vector<std::string> judge(const std::string& xml) {
     return violations(wbem::readXml(xml, 64));

@@ -98,12 +98,12 @@ TEST(ObjectReader, RefusesWrongStructures) {
 
 TEST(ObjectReader, RefusesValuesThatTheirTypeDoesNotHave) {
     EXPECT_EQ(instanceFailure("<PROPERTY NAME='p' TYPE='uint8'><VALUE>300</VALUE></PROPERTY>"),
-              "4: p: \"300\" is no uint8");
+              "4: p: \"300\" is not of type uint8");
     EXPECT_EQ(instanceFailure("<PROPERTY NAME='p' TYPE='boolean'><VALUE></VALUE></PROPERTY>"),
-              "4: p: \"\" is no boolean");
+              "4: p: \"\" is not of type boolean");
     EXPECT_EQ(pathFailure("<INSTANCENAME CLASSNAME='A'><KEYBINDING NAME='k'>"
                           "<KEYVALUE VALUETYPE='numeric'>x</KEYVALUE></KEYBINDING></INSTANCENAME>"),
-              "4: k: \"x\" is no number");
+              "4: k: \"x\" is not a number");
 }
 
 TEST(ObjectReader, RefusesDoubledNames) {

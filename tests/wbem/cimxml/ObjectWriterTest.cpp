@@ -3,6 +3,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include "cimom/ClassRepository.h"
 #include "cimom/ObjectPathText.h"
 #include "kit/ElementTable.h"
 

@@ -5,6 +5,7 @@
 #include <memory>
 #include <random>
 
+#include "cimom/ClassRepository.h"
 #include "cimxml/Call.h"
 #include "cimxml/ClassReader.h"
 #include "cimxml/Errors.h"
@@ -20,8 +21,8 @@ Call callOf(const std::string& method) {
     return call;
 }
 
-std::string answer(const std::string& content, const std::string& method = "GetInstance") {
-    return answerHead(callOf(method)) + content + answerTail(callOf(method));
+std::string responseWith(const std::string& content, const std::string& method = "GetInstance") {
+    return responseHead(callOf(method)) + content + responseTail(callOf(method));
 }
 
 std::string refusal(const std::string& body) {
@@ -37,21 +38,21 @@ std::string refusal(const std::string& body) {
 
 TEST(OperationResponse, HoldsWhatIsReturned) {
     const auto response = readResponse(
-        answer("<IRETURNVALUE><CLASSNAME NAME='A'/><CLASSNAME NAME='B'/></IRETURNVALUE>"
-               "<PARAMVALUE NAME='EndOfSequence'/>"),
+        responseWith("<IRETURNVALUE><CLASSNAME NAME='A'/><CLASSNAME NAME='B'/></IRETURNVALUE>"
+                     "<PARAMVALUE NAME='EndOfSequence'/>"),
         "getinstance", 16);
     EXPECT_EQ(response.code, 0U);
     ASSERT_EQ(response.returned.size(), 2U);
     EXPECT_EQ(*response.returned[1].attribute("NAME"), "B");
-    EXPECT_TRUE(readResponse(answer(""), "GetInstance", 16).returned.empty());
+    EXPECT_TRUE(readResponse(responseWith(""), "GetInstance", 16).returned.empty());
 }
 
 TEST(OperationResponse, HoldsTheStatus) {
     const auto response =
-        readResponse(errorAnswer(callOf("GetInstance"), 6, "not <here>"), "GetInstance", 16);
+        readResponse(errorResponse(callOf("GetInstance"), 6, "not <here>"), "GetInstance", 16);
     EXPECT_EQ(response.code, 6U);
     EXPECT_EQ(response.description, "not <here>");
-    EXPECT_EQ(readResponse(answer("<ERROR CODE='21'/>"), "GetInstance", 16).description, "");
+    EXPECT_EQ(readResponse(responseWith("<ERROR CODE='21'/>"), "GetInstance", 16).description, "");
 }
 
 TEST(OperationResponse, AnythingElseIsRefused) {
@@ -64,13 +65,14 @@ TEST(OperationResponse, AnythingElseIsRefused) {
               "element SIMPLEREQ where SIMPLERSP belongs");
     EXPECT_EQ(refusal("<CIM><MESSAGE><SIMPLERSP><IMETHODRESPONSE/></SIMPLERSP></MESSAGE></CIM>"),
               "IMETHODRESPONSE without NAME");
-    EXPECT_EQ(refusal(answer("", "GetClass")), "a response to GetClass");
-    EXPECT_EQ(refusal(answer("<ERROR/>")), "ERROR without CODE");
-    EXPECT_EQ(refusal(answer("<ERROR CODE='0'/>")), "CODE \"0\" of ERROR");
-    EXPECT_EQ(refusal(answer("<ERROR CODE='99999999999'/>")), "CODE \"99999999999\" of ERROR");
-    EXPECT_EQ(refusal(answer("<INSTANCE CLASSNAME='A'/>")),
+    EXPECT_EQ(refusal(responseWith("", "GetClass")), "a response to GetClass");
+    EXPECT_EQ(refusal(responseWith("<ERROR/>")), "ERROR without CODE");
+    EXPECT_EQ(refusal(responseWith("<ERROR CODE='0'/>")), "CODE \"0\" of ERROR");
+    EXPECT_EQ(refusal(responseWith("<ERROR CODE='99999999999'/>")),
+              "CODE \"99999999999\" of ERROR");
+    EXPECT_EQ(refusal(responseWith("<INSTANCE CLASSNAME='A'/>")),
               "element INSTANCE where IRETURNVALUE belongs");
-    EXPECT_EQ(refusal(answer("<IRETURNVALUE>text</IRETURNVALUE>")), "text in IRETURNVALUE");
+    EXPECT_EQ(refusal(responseWith("<IRETURNVALUE>text</IRETURNVALUE>")), "text in IRETURNVALUE");
     EXPECT_EQ(refusal("<!DOCTYPE CIM><CIM/>"),
               "XML: line 1: a document type declaration is not accepted");
 }
@@ -157,7 +159,7 @@ TEST(ReturnedInstance, HasNoMorePropertiesThanCanBeCompared) {
                  NotValid);
 }
 
-/// Reads an answer to the end, whatever it holds; whether it could be read.
+/// Reads a response to the end, whatever it holds; whether it could be read.
 bool isReadable(const std::string& body, const std::string& method) {
     try {
         for (const XmlElement& one : readResponse(body, method, 64).returned) {
@@ -202,7 +204,7 @@ TEST(OperationResponse, NoDamageDoesMoreThanMakeItUnreadable) {
         } else {
             writeInstance(content, objects.instance(), nullptr);
         }
-        std::string body = answer(content + "</IRETURNVALUE>", method);
+        std::string body = responseWith(content + "</IRETURNVALUE>", method);
         ASSERT_TRUE(isReadable(body, method)) << body;
         for (std::size_t damage = 1 + below(3); damage > 0 && !body.empty(); --damage) {
             const std::size_t place = below(body.size());

@@ -45,7 +45,7 @@ TEST(RoundTrip, PathsOfAnyContentSurvive) {
     }
 }
 
-TEST(RoundTrip, InstancesSurviveSomebodyElsesLayout) {
+TEST(RoundTrip, InstancesSurviveAnotherLayout) {
     // White space between elements and another quotation mark mean nothing.
     const wbem::XmlElement element = wbem::readXml(
         "<?xml version='1.0'?>\n<!-- a comment --><INSTANCE CLASSNAME='A'>\n  <PROPERTY NAME='s' "

@@ -16,7 +16,7 @@
 
 namespace cimom::wbem {
 
-/// Somebody whose password was right.
+/// A user whose password was right.
 struct Identity {
     std::string name;
     Role role = Role::read;
@@ -38,7 +38,7 @@ class Authenticator {
     [[nodiscard]] std::optional<Identity> remembered(std::string_view authorization);
 
     /// The identity that an Authorization header proves; none when it proves none.
-    /// Takes equally long for users that there are and are not.
+    /// Takes equally long for known and unknown users.
     [[nodiscard]] std::optional<Identity> check(std::string_view authorization);
 
     /// For the log: the user whom a header names, or "an unknown user": what stands
@@ -61,7 +61,7 @@ class Authenticator {
     const std::vector<User> users_;
     const std::function<Clock::time_point()> now_;
     std::array<unsigned char, 32> key_{};
-    std::string dummyHash_;  ///< compared with for users that there are not
+    std::string dummyHash_;  ///< what passwords of unknown users are compared with
     std::mutex mutex_;
     std::map<Digest, Memory> memory_;
     std::atomic<std::uint64_t> refusals_{0};

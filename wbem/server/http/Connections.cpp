@@ -8,12 +8,6 @@
 
 namespace cimom::wbem {
 
-namespace {
-
-constexpr unsigned serviceUnavailable = 503;
-
-}  // namespace
-
 Connections::Connection* Connections::opened(int socket, std::string address) {
     const std::lock_guard lock(mutex_);
     return &connections_.emplace_back(
@@ -31,10 +25,10 @@ void Connections::closed(Connection* connection) {
 }
 
 void Connections::set(Connection& connection, std::chrono::seconds time,
-                      std::shared_ptr<Exchange> exchange, bool answering) {
+                      std::shared_ptr<Exchange> exchange, bool responding) {
     const std::lock_guard lock(mutex_);
     connection.deadline = Clock::now() + time;
-    connection.answering = answering;
+    connection.responding = responding;
     connection.exchange.swap(exchange);
 }
 
@@ -47,7 +41,7 @@ void Connections::expectResult(Connection& connection, std::shared_ptr<Exchange>
 }
 
 void Connections::expectTaking(Connection& connection) {
-    set(connection, answer_, nullptr, true);
+    set(connection, response_, nullptr, true);
 }
 
 void Connections::endOverdue() {
@@ -69,7 +63,7 @@ void Connections::endOverdue() {
         }
     }
     for (const auto& exchange : overdue) {
-        exchange->finish(HttpAnswer::failure(serviceUnavailable));
+        exchange->finish(HttpResponse::failure(http::serviceUnavailable));
     }
 }
 
@@ -84,14 +78,14 @@ void Connections::endAll() {
         }
     }
     for (const auto& exchange : open) {
-        exchange->finish(HttpAnswer::failure(serviceUnavailable));
+        exchange->finish(HttpResponse::failure(http::serviceUnavailable));
     }
 }
 
 bool Connections::isBusy() const {
     const std::lock_guard lock(mutex_);
     return std::any_of(connections_.begin(), connections_.end(), [](const Connection& each) {
-        return each.answering || each.exchange != nullptr;
+        return each.responding || each.exchange != nullptr;
     });
 }
 

@@ -22,11 +22,11 @@ class Connections {
         std::string address;
         Clock::time_point deadline;
         std::shared_ptr<Exchange> exchange;  ///< while a worker has it
-        bool answering = false;              ///< the client takes an answer
+        bool responding = false;             ///< the client takes a response
     };
 
-    Connections(std::chrono::seconds request, std::chrono::seconds answer)
-        : request_(request), answer_(answer) {}
+    Connections(std::chrono::seconds request, std::chrono::seconds response)
+        : request_(request), response_(response) {}
 
     /// A new connection, which has to bring a request. Lives until closed().
     Connection* opened(int socket, std::string address);
@@ -37,22 +37,22 @@ class Connections {
     void expectRequest(Connection& connection);
     /// A worker has its request.
     void expectResult(Connection& connection, std::shared_ptr<Exchange> exchange);
-    /// The client has to take the answer.
+    /// The client has to take the response.
     void expectTaking(Connection& connection);
 
-    /// Ends what is overdue: a worker's request by an answer, else the connection.
+    /// Ends what is overdue: a request that a worker has by a failure, else the connection.
     void endOverdue();
-    /// Answers all requests that workers have, since the server ends.
+    /// Ends all requests that workers have by a failure, since the server ends.
     void endAll();
-    /// Whether an answer is still to be given or taken.
+    /// Whether a response is still to be made or taken.
     [[nodiscard]] bool isBusy() const;
 
   private:
     void set(Connection& connection, std::chrono::seconds time, std::shared_ptr<Exchange> exchange,
-             bool answering);
+             bool responding);
 
     const std::chrono::seconds request_;
-    const std::chrono::seconds answer_;
+    const std::chrono::seconds response_;
     mutable std::mutex mutex_;
     std::list<Connection> connections_;
 };

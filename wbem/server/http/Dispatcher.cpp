@@ -3,17 +3,9 @@
 #include <utility>
 
 #include "cimxml/Call.h"
-#include "operations/ModificationText.h"
+#include "operations/Modification.h"
 
 namespace cimom::wbem {
-
-namespace {
-
-constexpr unsigned badRequest = 400;
-constexpr unsigned serverFault = 500;
-constexpr unsigned serviceUnavailable = 503;
-
-}  // namespace
 
 Dispatcher::Dispatcher(ObjectManager& manager, const ServerSettings& settings, const ServerLog& log)
     : settings_(settings),
@@ -55,7 +47,7 @@ void Dispatcher::checkPassword(const SharedExchange& exchange) {
         }
     } catch (const std::exception& error) {
         log_(LogKind::failure, error.what());
-        exchange->finish(HttpAnswer::failure(serverFault));
+        exchange->finish(HttpResponse::failure(http::serverFault));
     }
 }
 
@@ -68,7 +60,7 @@ void Dispatcher::admit(const SharedExchange& exchange, const Identity& identity)
 void Dispatcher::runOrRefuse(TaskPool& pool, const SharedExchange& exchange, TaskPool::Task task) {
     if (!pool.run(std::move(task))) {
         log_(LogKind::failure, "too many requests wait for a worker, or no worker comes back");
-        exchange->finish(HttpAnswer::failure(serviceUnavailable));
+        exchange->finish(HttpResponse::failure(http::serviceUnavailable));
     }
 }
 
@@ -76,8 +68,8 @@ void Dispatcher::refuse(const SharedExchange& exchange, const std::string& who) 
     log_(LogKind::refusal, "refused " + who + " from " + exchange->address() + ", refusal number " +
                                std::to_string(authenticator_->countRefusal()));
     if (!timers_.runAfter(settings_.refusalDelay,
-                          [exchange] { exchange->finish(HttpAnswer::refusal()); })) {
-        exchange->finish(HttpAnswer::failure(serviceUnavailable));
+                          [exchange] { exchange->finish(HttpResponse::refusal()); })) {
+        exchange->finish(HttpResponse::failure(http::serviceUnavailable));
     }
 }
 
@@ -113,16 +105,16 @@ void Dispatcher::work(const SharedExchange& exchange, const Caller& caller) {
         checkAgreement(*exchange->headers, call);
         Caller asking = caller;
         asking.gone = [&exchange] { return exchange->isFinished(); };
-        exchange->finish(HttpAnswer::of(operations_.perform(call, asking)));
+        exchange->finish(HttpResponse::of(operations_.perform(call, asking)));
     } catch (const HttpFailure& failure) {
         log_(LogKind::request, exchange->address() + ": " + failure.what());
-        exchange->finish(HttpAnswer::failure(failure));
+        exchange->finish(HttpResponse::failure(failure));
     } catch (const NotValid& error) {
         log_(LogKind::request, exchange->address() + ": " + error.what());
-        exchange->finish(HttpAnswer::failure(badRequest, "request-not-valid"));
+        exchange->finish(HttpResponse::failure(http::badRequest, "request-not-valid"));
     } catch (const std::exception& error) {
         log_(LogKind::failure, error.what());
-        exchange->finish(HttpAnswer::failure(serverFault));
+        exchange->finish(HttpResponse::failure(http::serverFault));
     }
 }
 

@@ -7,21 +7,21 @@
 #include "http/Exchange.h"
 #include "http/TaskPool.h"
 #include "operations/Operations.h"
-#include "wbem/Server.h"
+#include "wbem/ServerSettings.h"
 
 namespace cimom::wbem {
 
 /// What happens to requests that have arrived: their users are admitted or refused,
-/// their operations are carried out, and each gets its answer. Safe for concurrent
+/// their operations are carried out, and each gets its response. Safe for concurrent
 /// use.
 class Dispatcher {
   public:
     /// Borrows all three.
     Dispatcher(ObjectManager& manager, const ServerSettings& settings, const ServerLog& log);
 
-    /// Sees to the answer of a request that is complete and handed over.
+    /// Sees to the response to a request that is complete and handed over.
     void dispatch(const SharedExchange& exchange);
-    /// Answers, after a while, that credentials are needed, and logs who had none.
+    /// Responds, after a while, that credentials are needed, and logs who had none.
     void refuse(const SharedExchange& exchange, const std::string& who);
 
     /// Runs a short task once the delay is over.

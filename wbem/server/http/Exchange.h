@@ -9,29 +9,12 @@
 #include <optional>
 #include <string>
 
-#include "cimxml/Errors.h"
 #include "http/HttpHead.h"
-#include "operations/Answer.h"
+#include "http/HttpResponse.h"
 
 namespace cimom::wbem {
 
-/// What a client is answered: a CIM answer, or a failure of HTTP.
-struct HttpAnswer {
-    unsigned status = 200;
-    std::string cimError;
-    std::optional<Answer> body;
-    std::string begun;          ///< the part of the body that is already written
-    bool authenticate = false;  ///< tell the client that it needs credentials
-
-    static HttpAnswer failure(unsigned status, std::string cimError = "");
-    static HttpAnswer failure(const HttpFailure& failure);
-    /// Of credentials, or of a request without them.
-    static HttpAnswer refusal();
-    /// Writes the beginning of the body at once.
-    static HttpAnswer of(Answer answer);
-};
-
-/// One request and its answer. The reading thread owns it until it has been
+/// One request and its response. The reading thread owns it until it has been
 /// handed over; then whoever comes first finishes it: a worker, the deadline, or
 /// the end of the server.
 class Exchange {
@@ -44,21 +27,21 @@ class Exchange {
     // While the request is being read, by one thread.
     std::optional<CimHeaders> headers;
     std::string body;
-    std::size_t discarded = 0;        ///< bytes of the body that are not kept
-    std::optional<HttpAnswer> early;  ///< decided before the body had arrived
-    Clock::time_point complete{};     ///< when the request had arrived
+    std::size_t discarded = 0;          ///< bytes of the body that are not kept
+    std::optional<HttpResponse> early;  ///< decided before the body had arrived
+    Clock::time_point complete{};       ///< when the request had arrived
 
     [[nodiscard]] const std::string& address() const noexcept { return address_; }
 
     /// Lets the connection rest until finish(). Only in its own thread.
     void suspend();
     [[nodiscard]] bool handedOver() const;
-    /// Whether it has its answer: nobody waits for another one.
+    /// Whether it has its response: no client waits for another one.
     [[nodiscard]] bool isFinished() const;
-    /// Gives the answer and wakes the connection. Only the first call counts.
-    void finish(HttpAnswer answer);
-    /// The answer, once there is one.
-    [[nodiscard]] std::optional<HttpAnswer> take();
+    /// Gives the response and wakes the connection. Only the first call counts.
+    void finish(HttpResponse response);
+    /// The response, once there is one.
+    [[nodiscard]] std::optional<HttpResponse> take();
 
   private:
     MHD_Connection* const connection_;
@@ -66,14 +49,9 @@ class Exchange {
     mutable std::mutex mutex_;
     bool handedOver_ = false;
     bool finished_ = false;
-    std::optional<HttpAnswer> answer_;
+    std::optional<HttpResponse> response_;
 };
 
 using SharedExchange = std::shared_ptr<Exchange>;
-
-/// Sends the answer of a request, which may go on for long after the call.
-/// `manPost`: the request was an M-POST. Answers what libmicrohttpd wants to hear.
-[[nodiscard]] MHD_Result sendAnswer(MHD_Connection* connection, HttpAnswer answer, bool manPost,
-                                    std::chrono::microseconds serverTime);
 
 }  // namespace cimom::wbem

@@ -5,18 +5,11 @@
 
 #include "cimom/Names.h"
 #include "cimxml/Errors.h"
+#include "cimxml/HttpStatus.h"
 
 namespace cimom::wbem {
 
 namespace {
-
-constexpr unsigned badRequest = 400;
-constexpr unsigned notFound = 404;
-constexpr unsigned methodNotAllowed = 405;
-constexpr unsigned lengthRequired = 411;
-constexpr unsigned contentTooLarge = 413;
-constexpr unsigned headersTooLarge = 431;
-constexpr unsigned notImplemented = 501;
 
 [[noreturn]] void refuse(unsigned status, const std::string& reason, const char* cimError = "") {
     throw HttpFailure(status, cimError, reason);
@@ -34,7 +27,7 @@ std::string_view trimmed(std::string_view text) noexcept {
 std::optional<std::string> single(const HttpHead& head, const std::string& name) {
     std::vector<std::string> values = head.values(name);
     if (values.size() > 1) {
-        refuse(badRequest, name + " is given twice");
+        refuse(http::badRequest, name + " is given twice");
     }
     return values.empty() ? std::nullopt : std::optional(std::string(trimmed(values.front())));
 }
@@ -46,7 +39,7 @@ void checkSizes(const HttpHead& head, const Limits& limits) {
         const std::size_t size = name.size() + value.size() + punctuation;
         sum += size;
         if (size > limits.headerLine || sum > limits.headers) {
-            refuse(headersTooLarge, "the headers are too long");
+            refuse(http::headersTooLarge, "the headers are too long");
         }
     }
 }
@@ -58,24 +51,24 @@ std::optional<std::size_t> readLength(const HttpHead& head, const Limits& limits
     const auto length = single(head, "Content-Length");
     if (coding) {
         if (length) {
-            refuse(badRequest, "both Transfer-Encoding and Content-Length");
+            refuse(http::badRequest, "both Transfer-Encoding and Content-Length");
         }
         if (!sameName(*coding, "chunked") || head.version != "HTTP/1.1") {
-            refuse(notImplemented, "a Transfer-Encoding other than chunked");
+            refuse(http::notImplemented, "a Transfer-Encoding other than chunked");
         }
         return std::nullopt;
     }
     if (!length) {
-        refuse(lengthRequired, "no Content-Length");
+        refuse(http::lengthRequired, "no Content-Length");
     }
     std::size_t bytes = 0;
     const char* const end = length->data() + length->size();
     const auto [stop, error] = std::from_chars(length->data(), end, bytes);
     if (stop != end || length->empty() || error == std::errc::invalid_argument) {
-        refuse(badRequest, "Content-Length is no number");
+        refuse(http::badRequest, "Content-Length is not a number");
     }
     if (error == std::errc::result_out_of_range || bytes > limits.body) {
-        refuse(contentTooLarge, "the body is too long");
+        refuse(http::contentTooLarge, "the body is too long");
     }
     return bytes;
 }
@@ -92,7 +85,7 @@ void checkContentType(const HttpHead& head) {
     const std::size_t semicolon = value.find(';');
     const std::string_view type = trimmed(std::string_view(value).substr(0, semicolon));
     if (!sameName(type, "application/xml") && !sameName(type, "text/xml")) {
-        refuse(badRequest, "Content-Type is not application/xml");
+        refuse(http::badRequest, "Content-Type is not application/xml");
     }
     std::string_view rest = semicolon == std::string::npos
                                 ? std::string_view()
@@ -105,7 +98,7 @@ void checkContentType(const HttpHead& head) {
         if (equals != std::string_view::npos &&
             sameName(trimmed(parameter.substr(0, equals)), "charset") &&
             !sameName(unquoted(trimmed(parameter.substr(equals + 1))), "utf-8")) {
-            refuse(badRequest, "the charset is not utf-8");
+            refuse(http::badRequest, "the charset is not utf-8");
         }
     }
 }
@@ -113,7 +106,7 @@ void checkContentType(const HttpHead& head) {
 /// The prefix of the CIM headers of an M-POST, as "73-" (DSP0200, 7.2.2).
 std::string readPrefix(const HttpHead& head) {
     if (head.version != "HTTP/1.1") {
-        refuse(badRequest, "M-POST is for HTTP/1.1");
+        refuse(http::badRequest, "M-POST is for HTTP/1.1");
     }
     const std::string man = single(head, "Man").value_or("");
     const std::size_t semicolon = man.find(';');
@@ -122,15 +115,15 @@ std::string readPrefix(const HttpHead& head) {
                                 ? std::string_view()
                                 : trimmed(std::string_view(man).substr(semicolon + 1));
     if (uri != "http://www.dmtf.org/cim/mapping/http/v1.0" || !rest.starts_with("ns")) {
-        refuse(badRequest, "M-POST without the Man of CIM");
+        refuse(http::badRequest, "M-POST without the Man of CIM");
     }
     rest = trimmed(rest.substr(2));
     if (!rest.starts_with('=')) {
-        refuse(badRequest, "M-POST without the Man of CIM");
+        refuse(http::badRequest, "M-POST without the Man of CIM");
     }
     rest = trimmed(rest.substr(1));
     if (rest.size() != 2 || !isDigit(rest[0]) || !isDigit(rest[1])) {
-        refuse(badRequest, "M-POST without the Man of CIM");
+        refuse(http::badRequest, "M-POST without the Man of CIM");
     }
     return std::string(rest) + '-';
 }
@@ -156,7 +149,7 @@ std::string decoded(const std::string& value) {
         const auto high = at + 2 < value.size() ? hexDigit(value[at + 1]) : std::nullopt;
         const auto low = high ? hexDigit(value[at + 2]) : std::nullopt;
         if (!low) {
-            refuse(badRequest, "a percent sign without two digits", "header-mismatch");
+            refuse(http::badRequest, "a percent sign without two digits", "header-mismatch");
         }
         text += static_cast<char>((*high << 4U) | *low);
         at += 2;
@@ -167,7 +160,7 @@ std::string decoded(const std::string& value) {
 std::string requiredDecoded(const HttpHead& head, const std::string& name) {
     const auto value = single(head, name);
     if (!value || value->empty()) {
-        refuse(badRequest, "no " + name, "header-mismatch");
+        refuse(http::badRequest, "no " + name, "header-mismatch");
     }
     return decoded(*value);
 }
@@ -196,14 +189,14 @@ std::vector<std::string> HttpHead::values(std::string_view name) const {
 
 CimHeaders readHead(const HttpHead& head, const Limits& limits) {
     if (head.target != "/cimom") {
-        refuse(notFound, "nothing is at this path");
+        refuse(http::notFound, "nothing is at this path");
     }
     if (head.method != "POST" && head.method != "M-POST") {
-        refuse(methodNotAllowed, "only POST and M-POST are served");
+        refuse(http::methodNotAllowed, "only POST and M-POST are served");
     }
     checkSizes(head, limits);
     if (head.version == "HTTP/1.1" && !single(head, "Host")) {
-        refuse(badRequest, "no Host");
+        refuse(http::badRequest, "no Host");
     }
     CimHeaders headers;
     headers.contentLength = readLength(head, limits);
@@ -212,13 +205,13 @@ CimHeaders readHead(const HttpHead& head, const Limits& limits) {
     const std::string prefix = headers.manPost ? readPrefix(head) : "";
     const auto operation = single(head, prefix + "CIMOperation");
     if (!operation) {
-        refuse(badRequest, "no CIMOperation");
+        refuse(http::badRequest, "no CIMOperation");
     }
     if (!sameName(*operation, "MethodCall")) {
-        refuse(badRequest, "CIMOperation is not MethodCall", "unsupported-operation");
+        refuse(http::badRequest, "CIMOperation is not MethodCall", "unsupported-operation");
     }
     if (single(head, prefix + "CIMBatch")) {
-        refuse(notImplemented, "several requests", "multiple-requests-unsupported");
+        refuse(http::notImplemented, "several requests", "multiple-requests-unsupported");
     }
     headers.method = requiredDecoded(head, prefix + "CIMMethod");
     headers.object = requiredDecoded(head, prefix + "CIMObject");
@@ -229,7 +222,8 @@ CimHeaders readHead(const HttpHead& head, const Limits& limits) {
 
 void checkAgreement(const CimHeaders& headers, const Call& call) {
     const auto mismatch = [](const char* name) {
-        refuse(badRequest, std::string(name) + " is not what the body says", "header-mismatch");
+        refuse(http::badRequest, std::string(name) + " is not what the body says",
+               "header-mismatch");
     };
     if (!sameName(headers.method, call.method)) {
         mismatch("CIMMethod");

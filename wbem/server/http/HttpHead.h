@@ -24,7 +24,7 @@ struct HttpHead {
 
 /// What the headers say about the CIM operation (DSP0200, 7.2).
 struct CimHeaders {
-    bool manPost = false;  ///< by M-POST, which wants another form of answer
+    bool manPost = false;  ///< by M-POST, which wants another form of response
     std::string method;    ///< decoded
     std::string object;    ///< decoded
     std::optional<std::string> protocolVersion;
@@ -34,7 +34,7 @@ struct CimHeaders {
     bool operator==(const CimHeaders&) const = default;
 };
 
-/// Reads the head of a request. Throws HttpFailure for anything that is no
+/// Reads the head of a request. Throws HttpFailure for anything that is not a
 /// CIM-XML request to this server, is ambiguous about its length, or is too long.
 [[nodiscard]] CimHeaders readHead(const HttpHead& head, const Limits& limits);
 

@@ -11,7 +11,7 @@
 #include <memory>
 #include <utility>
 
-#include "wbem/Server.h"
+#include "wbem/ServerSettings.h"
 
 namespace cimom::wbem {
 
@@ -21,7 +21,7 @@ ListeningSocket::ListeningSocket(const std::string& address, std::uint16_t port)
     hints.ai_socktype = SOCK_STREAM;
     addrinfo* found = nullptr;
     if (::getaddrinfo(address.c_str(), std::to_string(port).c_str(), &hints, &found) != 0) {
-        throw ServerError("\"" + address + "\" is no IPv4 or IPv6 address");
+        throw ServerError("\"" + address + "\" is not an IPv4 or IPv6 address");
     }
     const std::unique_ptr<addrinfo, void (*)(addrinfo*)> owned(found, ::freeaddrinfo);
     fd_ = ::socket(found->ai_family, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0);

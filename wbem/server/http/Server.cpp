@@ -19,13 +19,10 @@ namespace cimom::wbem {
 
 namespace {
 
-constexpr unsigned contentTooLarge = 413;
-constexpr unsigned serverFault = 500;
-constexpr unsigned serviceUnavailable = 503;
 constexpr std::uint16_t httpPort = 5988;
 constexpr std::uint16_t httpsPort = 5989;
 constexpr std::chrono::milliseconds watchInterval{100};
-/// How long clients have to take their last answers when the server ends.
+/// How long clients have to take their last responses when the server ends.
 constexpr std::chrono::seconds farewell{2};
 
 MHD_Result addHeader(void* headers, MHD_ValueKind /*kind*/, const char* name, const char* value) {
@@ -52,7 +49,7 @@ class Server::Implementation {
     Implementation(ObjectManager& manager, ServerSettings settings, ServerLog log)
         : settings_(checked(std::move(settings))),
           log_(std::move(log)),
-          connections_(settings_.limits.request, settings_.limits.answer),
+          connections_(settings_.limits.request, settings_.limits.response),
           dispatcher_(manager, settings_, log_) {
         start();
         watch();
@@ -61,7 +58,7 @@ class Server::Implementation {
     ~Implementation() {
         stopping_ = true;
         MHD_quiesce_daemon(daemon_.get());
-        // Nobody else finishes a request from here on but those that a worker has.
+        // From here on only the requests that a worker has are finished.
         dispatcher_.stop();
         connections_.endAll();
         const auto patience = Connections::Clock::now() + farewell;
@@ -100,7 +97,7 @@ class Server::Implementation {
         port_ = socket.port();
         const Limits& limits = settings_.limits;
         // Room for the request line, for the tables that the headers become, and for
-        // a piece of an answer.
+        // a piece of a response.
         constexpr std::size_t further = 65536;
         const std::size_t memory = 2 * limits.headers + further;
         std::vector<MHD_OptionItem> options{
@@ -136,8 +133,8 @@ class Server::Implementation {
         if (!daemon_) {
             throw ServerError(settings_.tls
                                   ? "the server cannot start; are certificate and key a pair? " +
-                                        libraryComplaint_
-                                  : "the server cannot start: " + libraryComplaint_);
+                                        libraryDiagnostic_
+                                  : "the server cannot start: " + libraryDiagnostic_);
         }
         socket_ = socket.release();
         starting_ = false;
@@ -166,7 +163,7 @@ class Server::Implementation {
             message.pop_back();
         }
         if (server.starting_) {
-            server.libraryComplaint_ = message;
+            server.libraryDiagnostic_ = message;
         }
         server.log_(LogKind::request, message);
     }
@@ -233,14 +230,14 @@ class Server::Implementation {
             exchange.headers = readHead(head, settings_.limits);
             if (settings_.users && !exchange.headers->authorization) {
                 // Nothing of a stranger's body is kept.
-                exchange.early = HttpAnswer::refusal();
+                exchange.early = HttpResponse::refusal();
             } else {
                 exchange.body.reserve(exchange.headers->contentLength.value_or(0));
             }
             return MHD_YES;
         } catch (const HttpFailure& failure) {
             log_(LogKind::request, exchange.address() + ": " + failure.what());
-            return send(connection, exchange, HttpAnswer::failure(failure));
+            return send(connection, exchange, HttpResponse::failure(failure));
         }
     }
 
@@ -249,7 +246,7 @@ class Server::Implementation {
     bool addBody(Exchange& exchange, std::string_view data) const {
         const std::size_t limit = settings_.limits.body;
         if (!exchange.early && data.size() > limit - exchange.body.size()) {
-            exchange.early = HttpAnswer::failure(contentTooLarge);
+            exchange.early = HttpResponse::failure(http::contentTooLarge);
             exchange.discarded = exchange.body.size();
             exchange.body = std::string();
         }
@@ -261,17 +258,17 @@ class Server::Implementation {
         return exchange.discarded / 2 <= limit;
     }
 
-    /// The request is complete, or its answer is there.
+    /// The request is complete, or its response is there.
     MHD_Result handle(MHD_Connection* connection, const SharedExchange& exchange) {
         if (exchange->handedOver()) {
-            auto answer = exchange->take();
-            // Woken without an answer: not by this server.
+            auto response = exchange->take();
+            // Woken without a response: not by this server.
             return send(connection, *exchange,
-                        answer ? *std::move(answer) : HttpAnswer::failure(serverFault));
+                        response ? *std::move(response) : HttpResponse::failure(http::serverFault));
         }
         exchange->complete = Exchange::Clock::now();
         if (stopping_) {
-            return send(connection, *exchange, HttpAnswer::failure(serviceUnavailable));
+            return send(connection, *exchange, HttpResponse::failure(http::serviceUnavailable));
         }
         if (exchange->early && !exchange->early->authenticate) {
             return send(connection, *exchange, *std::move(exchange->early));
@@ -279,21 +276,21 @@ class Server::Implementation {
         connections_.expectResult(connectionOf(connection), exchange);
         exchange->suspend();
         if (exchange->early) {
-            dispatcher_.refuse(exchange, "nobody");
+            dispatcher_.refuse(exchange, "a client without credentials");
         } else {
             dispatcher_.dispatch(exchange);
         }
         return MHD_YES;
     }
 
-    MHD_Result send(MHD_Connection* connection, Exchange& exchange, HttpAnswer answer) {
+    MHD_Result send(MHD_Connection* connection, Exchange& exchange, HttpResponse response) {
         connections_.expectTaking(connectionOf(connection));
         const auto time = exchange.complete == Exchange::Clock::time_point()
                               ? Exchange::Clock::duration()
                               : Exchange::Clock::now() - exchange.complete;
-        return sendAnswer(connection, std::move(answer),
-                          exchange.headers && exchange.headers->manPost,
-                          std::chrono::duration_cast<std::chrono::microseconds>(time));
+        return sendResponse(connection, std::move(response),
+                            exchange.headers && exchange.headers->manPost,
+                            std::chrono::duration_cast<std::chrono::microseconds>(time));
     }
 
     // Not constant, as the library takes its texts by pointers to plain char.
@@ -303,7 +300,7 @@ class Server::Implementation {
     Connections connections_;
     std::atomic<bool> starting_{true};
     std::atomic<bool> stopping_{false};
-    std::string libraryComplaint_;
+    std::string libraryDiagnostic_;
     std::uint16_t port_ = 0;
     int socket_ = -1;  ///< of the daemon, which leaves the closing to us once quiesced
     std::unique_ptr<MHD_Daemon, Stopped> daemon_;

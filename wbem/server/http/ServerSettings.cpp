@@ -3,13 +3,13 @@
 
 #include <stdexcept>
 
-#include "wbem/Server.h"
+#include "wbem/ServerSettings.h"
 
 namespace cimom::wbem {
 
 namespace {
 
-/// 127.0.0.0/8 and ::1. Throws ServerError for a text that is no address.
+/// 127.0.0.0/8 and ::1. Throws ServerError for a text that is not an address.
 bool isLoopback(const std::string& address) {
     in_addr four{};
     if (::inet_pton(AF_INET, address.c_str(), &four) == 1) {
@@ -20,7 +20,7 @@ bool isLoopback(const std::string& address) {
     if (::inet_pton(AF_INET6, address.c_str(), &six) == 1) {
         return IN6_IS_ADDR_LOOPBACK(&six) != 0;
     }
-    throw ServerError("\"" + address + "\" is no IPv4 or IPv6 address");
+    throw ServerError("\"" + address + "\" is not an IPv4 or IPv6 address");
 }
 
 }  // namespace

@@ -33,7 +33,7 @@ void TaskPool::startLocked() {
 
 std::size_t TaskPool::replaceStuck(Clock::duration patience) {
     const std::lock_guard lock(mutex_);
-    // One that has ended holds the mutex no more, and is joined without waiting.
+    // A worker that has ended does not hold the mutex, and is joined without waiting.
     std::erase_if(workers_, [](Worker& worker) {
         if (worker.ended) {
             worker.thread.join();
@@ -97,7 +97,7 @@ void TaskPool::stop() {
     {
         const std::lock_guard lock(mutex_);
         stopped_ = true;
-        // What the tasks hold may be released without the lock only.
+        // What the tasks hold must be released without the lock.
         ready.swap(ready_);
         later.swap(later_);
     }

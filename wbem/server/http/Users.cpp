@@ -134,7 +134,7 @@ struct Wiped {
 std::optional<std::string> hashed(const std::string& password, const std::string& setting) {
     const std::unique_ptr<crypt_data, Wiped> data(std::make_unique<crypt_data>().release());
     const char* const hash = ::crypt_r(password.c_str(), setting.c_str(), data.get());
-    // A failure is told by a text that is no hash and begins with an asterisk.
+    // A failure is told by a text that is not a hash and begins with an asterisk.
     if (hash == nullptr || hash[0] == '*') {
         return std::nullopt;
     }

@@ -9,7 +9,7 @@ namespace cimom::wbem {
 namespace {
 
 /// The parameters of one of the four operations, which differ in what they have.
-struct Question {
+struct AssociationParameters {
     Parameters::ObjectName object;
     AssociationRequest filter;
     bool classOrigin = false;
@@ -19,38 +19,37 @@ struct Question {
 enum class Kind { associators, references };
 enum class Result { objects, names };
 
-Question questionOf(Request& request, Kind kind, Result result) {
+AssociationParameters readParameters(Request& request, Kind kind, Result result) {
     Parameters& parameters = request.parameters;
-    Question question;
-    question.object = parameters.requiredObjectName("ObjectName");
-    question.object.path = located(request, std::move(question.object.path));
-    question.filter.resultClass = parameters.className("ResultClass");
-    question.filter.role = parameters.text("Role");
+    AssociationParameters wanted;
+    wanted.object = parameters.requiredObjectName("ObjectName");
+    wanted.object.path = located(request, std::move(wanted.object.path));
+    wanted.filter.resultClass = parameters.className("ResultClass");
+    wanted.filter.role = parameters.text("Role");
     if (kind == Kind::associators) {
-        question.filter.assocClass = parameters.className("AssocClass");
-        question.filter.resultRole = parameters.text("ResultRole");
+        wanted.filter.assocClass = parameters.className("AssocClass");
+        wanted.filter.resultRole = parameters.text("ResultRole");
     }
     if (result == Result::objects) {
-        question.qualifiers = parameters.flag("IncludeQualifiers", false);
-        question.classOrigin = parameters.flag("IncludeClassOrigin", false);
-        question.filter.propertyList = parameters.texts("PropertyList");
+        wanted.qualifiers = parameters.flag("IncludeQualifiers", false);
+        wanted.classOrigin = parameters.flag("IncludeClassOrigin", false);
+        wanted.filter.propertyList = parameters.texts("PropertyList");
     }
-    question.filter.principal = request.caller.user.value_or("");
+    wanted.filter.principal = request.caller.user.value_or("");
     parameters.finish();
-    return question;
+    return wanted;
 }
 
-Answer classAssociationsAnswer(Request& request, const Question& question, Kind kind,
-                               Result result) {
+ResponseBody classAssociationsResponse(Request& request, const AssociationParameters& wanted,
+                                       Kind kind, Result result) {
     const ClassDeclaration& source =
-        requireClass(request, question.object.path.className, CimStatus::invalidClass);
+        requireClass(request, wanted.object.path.className, CimStatus::invalidClass);
     const ClassRepository& repository = request.manager.repository();
     auto classes = kind == Kind::associators
-                       ? associatedClasses(source, question.filter, repository)
-                       : associationClasses(source, question.filter, repository);
-    const ClassForm form{false, question.qualifiers, question.classOrigin,
-                         question.filter.propertyList};
-    return classesAnswer(
+                       ? associatedClasses(source, wanted.filter, repository)
+                       : associationClasses(source, wanted.filter, repository);
+    const ClassForm form{false, wanted.qualifiers, wanted.classOrigin, wanted.filter.propertyList};
+    return classesResponse(
         request.call, std::move(classes),
         [form, result, host = request.manager.host(), nameSpace = request.call.nameSpace](
             std::string& out, const ClassDeclaration* declaration) {
@@ -64,14 +63,14 @@ Answer classAssociationsAnswer(Request& request, const Question& question, Kind 
         });
 }
 
-Answer objectsAnswer(Request& request, Kind kind) {
-    const Question question = questionOf(request, kind, Result::objects);
-    if (question.object.isClass) {
-        return classAssociationsAnswer(request, question, kind, Result::objects);
+ResponseBody objectsResponse(Request& request, Kind kind) {
+    const AssociationParameters wanted = readParameters(request, kind, Result::objects);
+    if (wanted.object.isClass) {
+        return classAssociationsResponse(request, wanted, kind, Result::objects);
     }
     const ClassRepository* const origins =
-        question.classOrigin ? &request.manager.repository() : nullptr;
-    return spoolAnswer(
+        wanted.classOrigin ? &request.manager.repository() : nullptr;
+    return spooledResponse(
         request.call,
         spooled<Instance>(
             request,
@@ -82,19 +81,19 @@ Answer objectsAnswer(Request& request, Kind kind) {
                 out += "</VALUE.OBJECTWITHPATH>";
             },
             [&](auto& receiver) {
-                const ObjectPath& path = question.object.path;
+                const ObjectPath& path = wanted.object.path;
                 return kind == Kind::associators
-                           ? request.manager.associators(path, question.filter, receiver)
-                           : request.manager.references(path, question.filter, receiver);
+                           ? request.manager.associators(path, wanted.filter, receiver)
+                           : request.manager.references(path, wanted.filter, receiver);
             }));
 }
 
-Answer namesAnswer(Request& request, Kind kind) {
-    const Question question = questionOf(request, kind, Result::names);
-    if (question.object.isClass) {
-        return classAssociationsAnswer(request, question, kind, Result::names);
+ResponseBody namesResponse(Request& request, Kind kind) {
+    const AssociationParameters wanted = readParameters(request, kind, Result::names);
+    if (wanted.object.isClass) {
+        return classAssociationsResponse(request, wanted, kind, Result::names);
     }
-    return spoolAnswer(
+    return spooledResponse(
         request.call,
         spooled<ObjectPath>(
             request,
@@ -104,10 +103,10 @@ Answer namesAnswer(Request& request, Kind kind) {
                 out += "</OBJECTPATH>";
             },
             [&](auto& receiver) {
-                const ObjectPath& path = question.object.path;
+                const ObjectPath& path = wanted.object.path;
                 return kind == Kind::associators
-                           ? request.manager.associatorNames(path, question.filter, receiver)
-                           : request.manager.referenceNames(path, question.filter, receiver);
+                           ? request.manager.associatorNames(path, wanted.filter, receiver)
+                           : request.manager.referenceNames(path, wanted.filter, receiver);
             }));
 }
 
@@ -115,12 +114,13 @@ Answer namesAnswer(Request& request, Kind kind) {
 
 std::vector<NamedOperation> associationOperations() {
     return {
-        {"Associators", [](Request& request) { return objectsAnswer(request, Kind::associators); }},
+        {"Associators",
+         [](Request& request) { return objectsResponse(request, Kind::associators); }},
         {"AssociatorNames",
-         [](Request& request) { return namesAnswer(request, Kind::associators); }},
-        {"References", [](Request& request) { return objectsAnswer(request, Kind::references); }},
+         [](Request& request) { return namesResponse(request, Kind::associators); }},
+        {"References", [](Request& request) { return objectsResponse(request, Kind::references); }},
         {"ReferenceNames",
-         [](Request& request) { return namesAnswer(request, Kind::references); }}};
+         [](Request& request) { return namesResponse(request, Kind::references); }}};
 }
 
 }  // namespace cimom::wbem

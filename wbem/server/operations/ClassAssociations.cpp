@@ -2,6 +2,8 @@
 
 #include <algorithm>
 
+#include "cimom/Names.h"
+
 namespace cimom::wbem {
 
 namespace {

@@ -3,7 +3,7 @@
 #include <vector>
 
 #include "cimom/ClassRepository.h"
-#include "cimom/ObjectManager.h"
+#include "cimom/Requests.h"
 
 namespace cimom::wbem {
 

@@ -1,6 +1,7 @@
 // Operations on classes (DSP0200, 5.4.2).
 #include <algorithm>
 
+#include "cimom/Names.h"
 #include "cimxml/ObjectWriter.h"
 #include "operations/Request.h"
 
@@ -41,29 +42,29 @@ std::vector<const ClassDeclaration*> classesBelow(Request& request) {
     return classes;
 }
 
-Answer getClass(Request& request) {
+ResponseBody getClass(Request& request) {
     const std::string className = request.parameters.requiredClassName("ClassName");
     ClassForm form = classForm(request);
     form.propertyList = request.parameters.texts("PropertyList");
     request.parameters.finish();
     std::string content = "<IRETURNVALUE>";
     writeClass(content, requireClass(request, className, CimStatus::notFound), form);
-    return plainAnswer(request.call, content + "</IRETURNVALUE>");
+    return plainResponse(request.call, content + "</IRETURNVALUE>");
 }
 
-Answer enumerateClasses(Request& request) {
+ResponseBody enumerateClasses(Request& request) {
     const ClassForm form = classForm(request);
-    return classesAnswer(request.call, classesBelow(request),
-                         [form](std::string& out, const ClassDeclaration* declaration) {
-                             writeClass(out, *declaration, form);
-                         });
+    return classesResponse(request.call, classesBelow(request),
+                           [form](std::string& out, const ClassDeclaration* declaration) {
+                               writeClass(out, *declaration, form);
+                           });
 }
 
-Answer enumerateClassNames(Request& request) {
-    return classesAnswer(request.call, classesBelow(request),
-                         [](std::string& out, const ClassDeclaration* declaration) {
-                             writeClassName(out, declaration->name);
-                         });
+ResponseBody enumerateClassNames(Request& request) {
+    return classesResponse(request.call, classesBelow(request),
+                           [](std::string& out, const ClassDeclaration* declaration) {
+                               writeClassName(out, declaration->name);
+                           });
 }
 
 }  // namespace

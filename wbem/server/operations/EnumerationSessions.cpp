@@ -1,4 +1,4 @@
-#include "wbem/EnumerationSessions.h"
+#include "operations/EnumerationSessions.h"
 
 #include <sys/random.h>
 
@@ -100,7 +100,8 @@ void EnumerationSessions::expireLocked(Clock::time_point now) {
 EnumerationSessions::Entries::iterator EnumerationSessions::find(
     const std::string& context, const std::optional<std::string>& user) {
     const auto found = entries_.find(context);
-    // That somebody else has it is told to nobody.
+    // The same error whether there is no such session or another user has it: a client
+    // does not learn which contexts exist.
     if (found == entries_.end() || found->second.session.user != user) {
         throw CimError(CimStatus::invalidEnumerationContext,
                        "there is no such enumeration, or not any more");

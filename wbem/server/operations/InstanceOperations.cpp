@@ -1,6 +1,7 @@
 // Operations on instances that only read (DSP0200, 5.4.2).
 #include <algorithm>
 
+#include "cimom/Names.h"
 #include "cimxml/ObjectWriter.h"
 #include "operations/Request.h"
 
@@ -26,7 +27,7 @@ InstanceRequest readingRequest(Request& request) {
     return {request.parameters.texts("PropertyList"), request.caller.user.value_or("")};
 }
 
-Answer enumerateInstances(Request& request) {
+ResponseBody enumerateInstances(Request& request) {
     const std::string className = request.parameters.requiredClassName("ClassName");
     const bool deep = request.parameters.flag("DeepInheritance", true);
     passOverDeprecated(request);
@@ -35,30 +36,31 @@ Answer enumerateInstances(Request& request) {
     request.parameters.finish();
     const ClassDeclaration* const cut =
         deep ? nullptr : request.manager.repository().find(className);
-    return spoolAnswer(request.call, spooled<Instance>(
-                                         request,
-                                         [origins, cut](std::string& out, Instance& instance) {
-                                             cutToClass(instance, cut);
-                                             out += "<VALUE.NAMEDINSTANCE>";
-                                             writeInstanceName(out, instance.path);
-                                             writeInstanceOf(out, instance, origins);
-                                             out += "</VALUE.NAMEDINSTANCE>";
-                                         },
-                                         [&](auto& receiver) {
-                                             return request.manager.enumerateInstances(
-                                                 classPath(request, className), reading, receiver);
-                                         }));
+    return spooledResponse(request.call, spooled<Instance>(
+                                             request,
+                                             [origins, cut](std::string& out, Instance& instance) {
+                                                 cutToClass(instance, cut);
+                                                 out += "<VALUE.NAMEDINSTANCE>";
+                                                 writeInstanceName(out, instance.path);
+                                                 writeInstanceOf(out, instance, origins);
+                                                 out += "</VALUE.NAMEDINSTANCE>";
+                                             },
+                                             [&](auto& receiver) {
+                                                 return request.manager.enumerateInstances(
+                                                     classPath(request, className), reading,
+                                                     receiver);
+                                             }));
 }
 
-Answer enumerateInstanceNames(Request& request) {
+ResponseBody enumerateInstanceNames(Request& request) {
     const std::string className = request.parameters.requiredClassName("ClassName");
     request.parameters.finish();
     const InstanceRequest reading{std::nullopt, request.caller.user.value_or("")};
-    return spoolAnswer(request.call,
-                       spooled<ObjectPath>(request, writeInstanceName, [&](auto& receiver) {
-                           return request.manager.enumerateInstanceNames(
-                               classPath(request, className), reading, receiver);
-                       }));
+    return spooledResponse(request.call,
+                           spooled<ObjectPath>(request, writeInstanceName, [&](auto& receiver) {
+                               return request.manager.enumerateInstanceNames(
+                                   classPath(request, className), reading, receiver);
+                           }));
 }
 
 /// Adds what the class has and the provider left out, as null: clients that modify
@@ -81,7 +83,7 @@ void addNulls(Instance& instance, const ClassRepository& repository,
     }
 }
 
-Answer getInstance(Request& request) {
+ResponseBody getInstance(Request& request) {
     const ObjectPath path =
         located(request, request.parameters.requiredInstanceName("InstanceName"));
     passOverDeprecated(request);
@@ -97,7 +99,7 @@ Answer getInstance(Request& request) {
     addNulls(instance, request.manager.repository(), reading.propertyList);
     std::string content = "<IRETURNVALUE>";
     writeInstanceOf(content, instance, origins);
-    return plainAnswer(request.call, content + "</IRETURNVALUE>");
+    return plainResponse(request.call, content + "</IRETURNVALUE>");
 }
 
 }  // namespace

@@ -37,7 +37,7 @@ void Limits::check() const {
     checkRange("max-waiting", waiting, 1, 65536);
     checkRange("max-result", result, kibi, std::size_t{1} << 40U);
     checkSeconds("request-timeout", request, day);
-    checkSeconds("answer-timeout", answer, day);
+    checkSeconds("answer-timeout", response, day);
     checkRange("max-enumerations", sessions.sessions, 1, 65536);
     checkSeconds("enumeration-timeout", sessions.defaultTimeout, day);
     checkSeconds("max-enumeration-timeout", sessions.longestTimeout, day);

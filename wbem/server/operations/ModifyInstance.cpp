@@ -1,5 +1,6 @@
 #include <algorithm>
 
+#include "cimom/Names.h"
 #include "operations/Request.h"
 
 namespace cimom::wbem {
@@ -78,10 +79,10 @@ void modify(Request& request, const Instance& instance, const InstanceRequest& h
 
 }  // namespace
 
-Answer modifyInstance(Request& request) {
+ResponseBody modifyInstance(Request& request) {
     Instance instance = request.parameters.requiredNamedInstance("ModifiedInstance");
     instance.path = located(request, std::move(instance.path));
-    // Deprecated, and about qualifiers of instances, which there are not.
+    // Deprecated, and about qualifiers of instances, which do not exist here.
     static_cast<void>(request.parameters.flag("IncludeQualifiers", true));
     const InstanceRequest how{request.parameters.texts("PropertyList"),
                               request.caller.user.value_or("")};
@@ -99,7 +100,7 @@ Answer modifyInstance(Request& request) {
         throw;
     }
     request.log(modification);
-    return plainAnswer(request.call, "");
+    return plainResponse(request.call, "");
 }
 
 }  // namespace cimom::wbem

@@ -35,26 +35,28 @@ Operations::Operations(ObjectManager& manager, const Limits& limits, Modificatio
       largestResult_(limits.result),
       log_(std::move(log)) {}
 
-Answer Operations::perform(const Call& call, const Caller& caller) {
+ResponseBody Operations::perform(const Call& call, const Caller& caller) {
     const auto found = call.intrinsic ? table().find(call.method) : table().end();
     if (found == table().end()) {
         // Also for methods of classes, none of which this manager calls. Clients
         // fall back to other operations on this very status.
-        return Answer(errorAnswer(call, static_cast<unsigned>(CimStatus::notSupported),
-                                  "the operation " + call.method + " is not offered"));
+        return ResponseBody(errorResponse(call, static_cast<unsigned>(CimStatus::notSupported),
+                                          "the operation " + call.method + " is not offered"));
     }
     try {
         Request request{manager_, sessions_, largestResult_, log_, call, caller, Parameters(call)};
         return found->second(request);
     } catch (const CimError& error) {
-        return Answer(errorAnswer(call, error.code, error.what()));
+        return ResponseBody(errorResponse(call, error.code, error.what()));
     } catch (const NotValid&) {
         throw;
     } catch (const std::bad_alloc&) {
-        return Answer(errorAnswer(call, static_cast<unsigned>(CimStatus::serverLimitsExceeded),
-                                  "the server is out of memory"));
+        return ResponseBody(errorResponse(call,
+                                          static_cast<unsigned>(CimStatus::serverLimitsExceeded),
+                                          "the server is out of memory"));
     } catch (const std::exception& error) {
-        return Answer(errorAnswer(call, static_cast<unsigned>(CimStatus::failed), error.what()));
+        return ResponseBody(
+            errorResponse(call, static_cast<unsigned>(CimStatus::failed), error.what()));
     }
 }
 

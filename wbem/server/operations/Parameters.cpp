@@ -2,6 +2,7 @@
 
 #include <algorithm>
 
+#include "cimom/Names.h"
 #include "cimxml/Errors.h"
 #include "cimxml/ObjectReader.h"
 #include "cimxml/ScalarText.h"
@@ -42,7 +43,7 @@ const XmlElement* Parameters::value(const char* name) {
 const XmlElement* Parameters::valueOf(const char* name, const char* element) {
     const XmlElement* const found = value(name);
     if (found != nullptr && found->name != element) {
-        invalid(std::string("parameter ") + name + " is no " + element);
+        invalid(std::string("parameter ") + name + " is not " + element);
     }
     return found;
 }
@@ -61,7 +62,7 @@ bool Parameters::flag(const char* name, bool standard) {
     }
     const auto scalar = readScalarText(Type::boolean, readText(*found));
     if (!scalar) {
-        invalid(std::string("parameter ") + name + " is no boolean");
+        invalid(std::string("parameter ") + name + " is not a boolean");
     }
     return std::get<bool>(*scalar);
 }
@@ -83,7 +84,7 @@ std::optional<std::uint32_t> Parameters::number(const char* name) {
     }
     const auto scalar = readScalarText(Type::uint32, readText(*found));
     if (!scalar) {
-        invalid(std::string("parameter ") + name + " is no uint32");
+        invalid(std::string("parameter ") + name + " is not a uint32");
     }
     return static_cast<std::uint32_t>(std::get<std::uint64_t>(*scalar));
 }

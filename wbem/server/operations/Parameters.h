@@ -5,7 +5,7 @@
 #include <string>
 #include <vector>
 
-#include "cimom/Cim.h"
+#include "cimom/Instance.h"
 #include "cimxml/Call.h"
 
 namespace cimom::wbem {
@@ -38,7 +38,7 @@ class Parameters {
     /// CimError when the two disagree about the class.
     [[nodiscard]] Instance requiredNamedInstance(const char* name);
 
-    /// Throws CimError when there is a parameter that nobody asked for.
+    /// Throws CimError when there is a parameter that was not read.
     void finish() const;
 
   private:

@@ -14,7 +14,7 @@ namespace {
 
 using Session = EnumerationSession;
 
-/// More objects come in no portion, whatever a client asks for.
+/// No portion has more objects, whatever a client asks for.
 constexpr std::uint32_t largestPortion = 100'000;
 
 /// The parameters that all Open operations have.
@@ -40,7 +40,7 @@ Opening readOpening(Request& request) {
     return {request.sessions.timeoutFor(timeout), std::min(portion, largestPortion)};
 }
 
-/// Objects that one answer brings.
+/// The objects of one response.
 struct Portion {
     RecordReader reader;
     std::string context;  ///< to go on with; empty: these were the last
@@ -71,8 +71,8 @@ std::string sequenceState(const std::string& context) {
 
 enum class Form { path, instance, instanceWithPath };
 
-Answer portionAnswer(Request& request, Portion portion, Form form) {
-    return {answerHead(request.call) + "<IRETURNVALUE>",
+ResponseBody portionResponse(Request& request, Portion portion, Form form) {
+    return {responseHead(request.call) + "<IRETURNVALUE>",
             [reader = std::move(portion.reader), form](std::string& out) mutable {
                 const auto record = reader.next();
                 if (!record) {
@@ -85,23 +85,23 @@ Answer portionAnswer(Request& request, Portion portion, Form form) {
                 out += both ? "</VALUE.INSTANCEWITHPATH>" : "";
                 return true;
             },
-            "</IRETURNVALUE>" + sequenceState(portion.context) + answerTail(request.call)};
+            "</IRETURNVALUE>" + sequenceState(portion.context) + responseTail(request.call)};
 }
 
-/// Answers the first portion, and keeps what is left.
-Answer begin(Request& request, const Opening& opening, Session::Kind kind,
-             const SpooledResult& result) {
+/// Responds with the first portion, and keeps what is left.
+ResponseBody begin(Request& request, const Opening& opening, Session::Kind kind,
+                   const SpooledResult& result) {
     Session session{kind, result.spool, 0, result.count, opening.timeout, request.caller.user};
     Portion portion = takePortion(session, opening.portion, "");
     if (session.left > 0) {
         portion.context = request.sessions.open(std::move(session));
     }
-    return portionAnswer(request, std::move(portion),
-                         kind == Session::Kind::paths ? Form::path : Form::instanceWithPath);
+    return portionResponse(request, std::move(portion),
+                           kind == Session::Kind::paths ? Form::path : Form::instanceWithPath);
 }
 
 template <typename Ask>
-Answer openPaths(Request& request, const Opening& opening, Ask&& ask) {
+ResponseBody openPaths(Request& request, const Opening& opening, Ask&& ask) {
     return begin(request, opening, Session::Kind::paths,
                  spooled<ObjectPath>(
                      request,
@@ -116,8 +116,8 @@ Answer openPaths(Request& request, const Opening& opening, Ask&& ask) {
 
 /// `cut`: the class to whose properties the instances are cut; null: all are shown.
 template <typename Ask>
-Answer openInstances(Request& request, const Opening& opening, bool classOrigin,
-                     const ClassDeclaration* cut, Ask&& ask) {
+ResponseBody openInstances(Request& request, const Opening& opening, bool classOrigin,
+                           const ClassDeclaration* cut, Ask&& ask) {
     const ClassRepository* const origins = classOrigin ? &request.manager.repository() : nullptr;
     return begin(request, opening, Session::Kind::instances,
                  spooled<Instance>(
@@ -134,7 +134,7 @@ Answer openInstances(Request& request, const Opening& opening, bool classOrigin,
                      std::forward<Ask>(ask)));
 }
 
-Answer openEnumerateInstances(Request& request) {
+ResponseBody openEnumerateInstances(Request& request) {
     const std::string className = request.parameters.requiredClassName("ClassName");
     const bool deep = request.parameters.flag("DeepInheritance", true);
     const bool classOrigin = request.parameters.flag("IncludeClassOrigin", false);
@@ -148,7 +148,7 @@ Answer openEnumerateInstances(Request& request) {
     });
 }
 
-Answer openEnumerateInstancePaths(Request& request) {
+ResponseBody openEnumerateInstancePaths(Request& request) {
     const std::string className = request.parameters.requiredClassName("ClassName");
     const Opening opening = readOpening(request);
     const InstanceRequest reading{std::nullopt, request.caller.user.value_or("")};
@@ -184,7 +184,7 @@ Source readSource(Request& request, bool associators, bool instances) {
     return source;
 }
 
-Answer openAssociated(Request& request, bool associators) {
+ResponseBody openAssociated(Request& request, bool associators) {
     const Source source = readSource(request, associators, true);
     const Opening opening = readOpening(request);
     return openInstances(request, opening, source.classOrigin, nullptr, [&](auto& receiver) {
@@ -193,7 +193,7 @@ Answer openAssociated(Request& request, bool associators) {
     });
 }
 
-Answer openAssociatedPaths(Request& request, bool associators) {
+ResponseBody openAssociatedPaths(Request& request, bool associators) {
     const Source source = readSource(request, associators, false);
     const Opening opening = readOpening(request);
     return openPaths(request, opening, [&](auto& receiver) {
@@ -216,8 +216,8 @@ Pulling readPulling(Request& request) {
     return pulling;
 }
 
-/// Answers with the next portion of a session with such objects.
-Answer pull(Request& request, Session::Kind kind, Form form) {
+/// Responds with the next portion of a session with objects of that kind.
+ResponseBody pull(Request& request, Session::Kind kind, Form form) {
     const Pulling pulling = readPulling(request);
     std::optional<Portion> portion;
     request.sessions.use(pulling.context, request.caller.user, [&](Session& session) {
@@ -227,38 +227,38 @@ Answer pull(Request& request, Session::Kind kind, Form form) {
         }
         portion = takePortion(session, pulling.portion, pulling.context);
     });
-    return portionAnswer(request, *std::move(portion), form);
+    return portionResponse(request, *std::move(portion), form);
 }
 
-Answer pullInstancesWithPath(Request& request) {
+ResponseBody pullInstancesWithPath(Request& request) {
     return pull(request, Session::Kind::instances, Form::instanceWithPath);
 }
 
-Answer pullInstancePaths(Request& request) {
+ResponseBody pullInstancePaths(Request& request) {
     return pull(request, Session::Kind::paths, Form::path);
 }
 
-/// DSP0200 has this for queries, which are not served; a client that does not need
-/// the paths may use it for any instances.
-Answer pullInstances(Request& request) {
+/// DSP0200 defines this operation for queries, which are not served. Here a client may
+/// use it for any instances whose paths it does not need.
+ResponseBody pullInstances(Request& request) {
     return pull(request, Session::Kind::instances, Form::instance);
 }
 
-Answer closeEnumeration(Request& request) {
+ResponseBody closeEnumeration(Request& request) {
     const std::string context = request.parameters.requiredText("EnumerationContext");
     request.parameters.finish();
     request.sessions.close(context, request.caller.user);
-    return plainAnswer(request.call, "");
+    return plainResponse(request.call, "");
 }
 
-Answer enumerationCount(Request& request) {
+ResponseBody enumerationCount(Request& request) {
     const std::string context = request.parameters.requiredText("EnumerationContext");
     request.parameters.finish();
     std::size_t count = 0;
     request.sessions.use(context, request.caller.user,
                          [&count](const Session& session) { count = session.left; });
-    return plainAnswer(request.call,
-                       "<IRETURNVALUE><VALUE>" + std::to_string(count) + "</VALUE></IRETURNVALUE>");
+    return plainResponse(
+        request.call, "<IRETURNVALUE><VALUE>" + std::to_string(count) + "</VALUE></IRETURNVALUE>");
 }
 
 }  // namespace

@@ -6,7 +6,7 @@
 #include <string>
 #include <string_view>
 
-#include "wbem/Spool.h"
+#include "operations/Spool.h"
 
 /// The objects of an enumeration in a spool, each as a record of its path and, of an
 /// instance, the instance: a client may pull the one with or without the other.

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 
+#include "cimom/Names.h"
 #include "cimxml/ObjectWriter.h"
 #include "cimxml/PathLocation.h"
 
@@ -84,9 +85,15 @@ void cutToClass(Instance& instance, const ClassDeclaration* declaration) {
 }
 
 template <typename Object>
-void SpoolReceiver<Object>::take(std::optional<Object> object) {
+void SpoolingReceiver<Object>::beginCall() {
+    sizeBefore_ = result_.spool->size();
+    countBefore_ = result_.count;
+}
+
+template <typename Object>
+void SpoolingReceiver<Object>::take(std::optional<Object> object) {
     if (caller_.gone && caller_.gone()) {
-        throw CimError(CimStatus::failed, "nobody waits for the result any more");
+        throw CimError(CimStatus::failed, "the client does not wait for the result any more");
     }
     if (object) {
         text_.clear();
@@ -97,19 +104,13 @@ void SpoolReceiver<Object>::take(std::optional<Object> object) {
 }
 
 template <typename Object>
-std::size_t SpoolReceiver<Object>::mark() {
-    marks_.push_back({result_.spool->size(), result_.count});
-    return marks_.size() - 1;
+void SpoolingReceiver<Object>::dropCall() {
+    result_.spool->cut(sizeBefore_);
+    result_.count = countBefore_;
 }
 
-template <typename Object>
-void SpoolReceiver<Object>::backTo(std::size_t mark) {
-    result_.spool->cut(marks_[mark].size);
-    result_.count = marks_[mark].count;
-}
-
-template class SpoolReceiver<ObjectPath>;
-template class SpoolReceiver<Instance>;
+template class SpoolingReceiver<ObjectPath>;
+template class SpoolingReceiver<Instance>;
 
 void writeInstanceOf(std::string& out, const Instance& instance,
                      const ClassRepository* originRepository) {
@@ -118,8 +119,8 @@ void writeInstanceOf(std::string& out, const Instance& instance,
         originRepository == nullptr ? nullptr : originRepository->find(instance.path.className));
 }
 
-Answer spoolAnswer(const Call& call, const SpooledResult& result) {
-    return {answerHead(call) + "<IRETURNVALUE>",
+ResponseBody spooledResponse(const Call& call, const SpooledResult& result) {
+    return {responseHead(call) + "<IRETURNVALUE>",
             [spool = std::shared_ptr<const Spool>(result.spool),
              position = std::size_t{0}](std::string& out) mutable {
                 constexpr std::size_t piece = 32768;
@@ -128,11 +129,11 @@ Answer spoolAnswer(const Call& call, const SpooledResult& result) {
                 position += size;
                 return size > 0;
             },
-            "</IRETURNVALUE>" + answerTail(call)};
+            "</IRETURNVALUE>" + responseTail(call)};
 }
 
-Answer plainAnswer(const Call& call, const std::string& content) {
-    return Answer(answerHead(call) + content + answerTail(call));
+ResponseBody plainResponse(const Call& call, const std::string& content) {
+    return ResponseBody(responseHead(call) + content + responseTail(call));
 }
 
 }  // namespace cimom::wbem

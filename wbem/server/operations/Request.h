@@ -8,11 +8,13 @@
 #include <utility>
 #include <vector>
 
+#include "cimom/ObjectManager.h"
 #include "cimxml/Errors.h"
-#include "operations/Answer.h"
-#include "operations/Operations.h"
+#include "operations/EnumerationSessions.h"
+#include "operations/Modification.h"
 #include "operations/Parameters.h"
-#include "wbem/Spool.h"
+#include "operations/ResponseBody.h"
+#include "operations/Spool.h"
 
 /// What the operations have in common.
 namespace cimom::wbem {
@@ -22,14 +24,14 @@ struct Request {
     ObjectManager& manager;
     EnumerationSessions& sessions;
     std::size_t largestResult = 0;  ///< bytes
-    const Operations::ModificationLog& log;
+    const ModificationLog& log;
     const Call& call;
     const Caller& caller;
     Parameters parameters;
 };
 
 /// Carries one operation out. Throws CimError and NotValid.
-using Operation = Answer (*)(Request&);
+using Operation = ResponseBody (*)(Request&);
 
 struct NamedOperation {
     const char* name;
@@ -40,7 +42,7 @@ struct NamedOperation {
 [[nodiscard]] std::vector<NamedOperation> associationOperations();
 [[nodiscard]] std::vector<NamedOperation> classOperations();
 [[nodiscard]] std::vector<NamedOperation> pullOperations();
-[[nodiscard]] Answer modifyInstance(Request& request);
+[[nodiscard]] ResponseBody modifyInstance(Request& request);
 
 /// The class of the call's namespace. Throws CimError for a namespace that there
 /// is not, or with `unknown` for an unknown class.
@@ -66,65 +68,64 @@ void cutToClass(Instance& instance, const ClassDeclaration* declaration);
 void writeInstanceOf(std::string& out, const Instance& instance,
                      const ClassRepository* originRepository);
 
-/// A result as its XML, of which `count` objects have come.
+/// A result as its XML, with the number of objects in it.
 struct SpooledResult {
     std::shared_ptr<Spool> spool;
     std::size_t count = 0;
 };
 
 /// Writes the objects of a result into a spool as they come, so that memory holds
-/// one of them. Absent ones are left out. Ends the request with CimError when
-/// nobody waits for it any more.
+/// one of them. Absent ones are left out. Ends the request with CimError when its
+/// client does not wait for it any more.
 template <typename Object>
-class SpoolReceiver final : public Receiver<Object> {
+class SpoolingReceiver final : public ResultReceiver<Object> {
   public:
     using Write = std::function<void(std::string&, Object&)>;
 
-    SpoolReceiver(SpooledResult& result, const Caller& caller, Write write)
+    SpoolingReceiver(SpooledResult& result, const Caller& caller, Write write)
         : result_(result), caller_(caller), write_(std::move(write)) {}
 
+    void beginCall() override;
     void take(std::optional<Object> object) override;
-    [[nodiscard]] std::size_t mark() override;
-    void backTo(std::size_t mark) override;
+    void dropCall() override;
 
   private:
-    struct Mark {
-        std::size_t size;
-        std::size_t count;
-    };
-
     SpooledResult& result_;
     const Caller& caller_;
     const Write write_;
     std::string text_;  ///< of one object; its memory is used again
-    std::vector<Mark> marks_;
+    // What there was when the last call began.
+    std::size_t sizeBefore_ = 0;
+    std::size_t countBefore_ = 0;
 };
 
-extern template class SpoolReceiver<ObjectPath>;
-extern template class SpoolReceiver<Instance>;
+extern template class SpoolingReceiver<ObjectPath>;
+extern template class SpoolingReceiver<Instance>;
 
 /// The result of a request that `ask` carries out with a receiver; each object as
 /// `write(out, object)` writes it. Throws CimError when it ends with a status.
 template <typename Object, typename Ask>
-SpooledResult spooled(Request& request, typename SpoolReceiver<Object>::Write write, Ask&& ask) {
+SpooledResult spooled(Request& request, typename SpoolingReceiver<Object>::Write write, Ask&& ask) {
     SpooledResult result{std::make_shared<Spool>(request.largestResult)};
-    SpoolReceiver<Object> receiver(result, request.caller, std::move(write));
+    SpoolingReceiver<Object> receiver(result, request.caller, std::move(write));
     const RequestEnd end = std::forward<Ask>(ask)(receiver);
     requireOk(end.status);
     return result;
 }
 
-/// An answer whose IRETURNVALUE is the text of a spool.
-[[nodiscard]] Answer spoolAnswer(const Call& call, const SpooledResult& result);
-/// An answer with a list of classes in its IRETURNVALUE: `write(out, class)` for each.
+/// A response whose IRETURNVALUE is the text of a spool.
+[[nodiscard]] ResponseBody spooledResponse(const Call& call, const SpooledResult& result);
+/// A response with a list of classes in its IRETURNVALUE: `write(out, class)` for each.
 template <typename Write>
-Answer classesAnswer(const Call& call, std::vector<const ClassDeclaration*> classes, Write write);
-/// An answer without a list: `content` is all that is in it.
-[[nodiscard]] Answer plainAnswer(const Call& call, const std::string& content);
+ResponseBody classesResponse(const Call& call, std::vector<const ClassDeclaration*> classes,
+                             Write write);
+/// A response without a list: `content` is all that is in it.
+[[nodiscard]] ResponseBody plainResponse(const Call& call, const std::string& content);
 
 template <typename Write>
-Answer classesAnswer(const Call& call, std::vector<const ClassDeclaration*> classes, Write write) {
-    return {answerHead(call) + "<IRETURNVALUE>",
+ResponseBody classesResponse(const Call& call, std::vector<const ClassDeclaration*> classes,
+                             Write write) {
+    return {responseHead(call) + "<IRETURNVALUE>",
             [classes = std::move(classes), write = std::move(write),
              next = std::size_t{0}](std::string& out) mutable {
                 if (next == classes.size()) {
@@ -133,7 +134,7 @@ Answer classesAnswer(const Call& call, std::vector<const ClassDeclaration*> clas
                 write(out, classes[next++]);
                 return true;
             },
-            "</IRETURNVALUE>" + answerTail(call)};
+            "</IRETURNVALUE>" + responseTail(call)};
 }
 
 }  // namespace cimom::wbem

@@ -1,4 +1,4 @@
-#include "wbem/Spool.h"
+#include "operations/Spool.h"
 
 #include <algorithm>
 #include <system_error>
@@ -10,7 +10,7 @@ namespace cimom::wbem {
 
 namespace {
 
-/// Most answers never see the disk.
+/// Most results never reach the disk.
 constexpr std::size_t inMemory = 65536;
 
 }  // namespace

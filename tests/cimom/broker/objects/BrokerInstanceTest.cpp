@@ -101,7 +101,7 @@ TEST_F(BrokerInstance, CharsArePassedAsTheTextPointerItself) {
     EXPECT_EQ(text(data.value.string), "buffer");
 }
 
-TEST_F(BrokerInstance, PathIsHandedOutAgainWhileNobodyChangesIt) {
+TEST_F(BrokerInstance, PathIsHandedOutAgainWhileItIsNotChanged) {
     CMPIObjectPath* const first = instance->ft->getObjectPath(instance, nullptr);
     EXPECT_EQ(instance->ft->getObjectPath(instance, nullptr), first);
     first->ft->setClassName(first, "Other");

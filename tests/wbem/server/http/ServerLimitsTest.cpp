@@ -120,7 +120,7 @@ TEST_F(WbemLimits, Connections) {
     // One more is closed, or waits until another one ends.
     RawClient further(server.port());
     further.send(good);
-    EXPECT_FALSE(further.isAnsweredWithin(std::chrono::milliseconds(500)));
+    EXPECT_FALSE(further.isRespondedWithin(std::chrono::milliseconds(500)));
     open.pop_back();
     const auto response = further.receive();
     if (!response) {
@@ -196,14 +196,14 @@ TEST_F(WbemLimits, WorkersAndWaitingRequests) {
     EXPECT_THAT(found, testing::UnorderedElementsAre(200, 200, 200, 503));
 }
 
-TEST_F(WbemLimits, TimeToTakeAnAnswer) {
-    settings.limits.answer = std::chrono::seconds(1);
+TEST_F(WbemLimits, TimeToTakeAResponse) {
+    settings.limits.response = std::chrono::seconds(1);
     setManyThings(50000);
     TestServer server(settings, manyConfiguration());
     RawClient client(server.port());
     client.send(httpRequest("EnumerateInstances",
                             callXml("EnumerateInstances", classParameter("Many_Thing"))));
-    ASSERT_TRUE(client.awaitAnswer());
+    ASSERT_TRUE(client.awaitResponse());
     std::this_thread::sleep_for(std::chrono::milliseconds(2500));
     // What had been sent arrives, and then the end.
     EXPECT_FALSE(client.receive());
@@ -255,7 +255,7 @@ TEST_F(WbemLimits, WorkersThatDoNotComeBackAreReplacedSoOften) {
             EXPECT_EQ(server.ask(call("Many_Thing")).status, 200U) << count;
         }
     }
-    // Beyond, nobody is left, and everybody is told.
+    // Beyond, no worker is left, and every client is told.
     while (server.ask(call("Many_Thing")).status != 503U) {
     }
     EXPECT_THAT(server.log(wbem::LogKind::failure),

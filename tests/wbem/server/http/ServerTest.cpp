@@ -16,7 +16,7 @@ using ::testing::SizeIs;
 
 class WbemServer : public testing::Test {
   protected:
-    /// A good request still gets its answer: nothing before has harmed the server.
+    /// A good request still gets its response: nothing before has harmed the server.
     void expectServed() {
         const HttpResponse response = server.ask(good);
         EXPECT_EQ(response.status, 200U);
@@ -33,7 +33,7 @@ class WbemServer : public testing::Test {
     const std::string expected = server.ask(good).body;
 };
 
-TEST_F(WbemServer, AnswersWithTheHeadersOfTheStandard) {
+TEST_F(WbemServer, RespondsWithTheHeadersOfTheStandard) {
     const HttpResponse response = server.ask(good);
     EXPECT_EQ(response.status, 200U);
     EXPECT_EQ(response.header("Content-Type"), "application/xml; charset=\"utf-8\"");
@@ -44,7 +44,7 @@ TEST_F(WbemServer, AnswersWithTheHeadersOfTheStandard) {
     EXPECT_THAT(returned(responseOf(response.body)), SizeIs(2));
 }
 
-TEST_F(WbemServer, AnswersAnMPostInItsForm) {
+TEST_F(WbemServer, RespondsToAnMPostInItsForm) {
     const HttpResponse response = server.ask(
         "M-POST /cimom HTTP/1.1\r\nHost: h\r\nContent-Type: text/xml\r\nMan: "
         "http://www.dmtf.org/cim/mapping/http/v1.0 ; ns=42\r\n42-CIMOperation: MethodCall\r\n"
@@ -237,7 +237,7 @@ TEST_F(WbemServer, ServesOthersBesideManySlowClients) {
     }
 }
 
-TEST(WbemLongAnswers, ComeInChunksAndWhole) {
+TEST(WbemLongResponses, ComeInChunksAndWhole) {
     constexpr unsigned count = 5000;
     setManyThings(count);
     TestServer server({}, manyConfiguration());
@@ -251,7 +251,7 @@ TEST(WbemLongAnswers, ComeInChunksAndWhole) {
               "thing " + std::to_string(count - 1));
 }
 
-TEST(WbemLongAnswers, MayBeLeftByTheirClients) {
+TEST(WbemLongResponses, MayBeLeftByTheirClients) {
     setManyThings(20000);
     TestServer server({}, manyConfiguration());
     for (int count = 0; count < 5; ++count) {
@@ -264,7 +264,7 @@ TEST(WbemLongAnswers, MayBeLeftByTheirClients) {
                 SizeIs(3));
 }
 
-TEST(WbemServerEnd, AnswersWhatIsUnderWay) {
+TEST(WbemServerEnd, RespondsToWhatIsUnderWay) {
     holdWaiting();
     auto server = std::make_unique<TestServer>(wbem::ServerSettings(), manyConfiguration());
     RawClient client(server->port());

@@ -40,7 +40,7 @@ class WbemUsers : public testing::Test {
             "users</VALUE></PROPERTY></INSTANCE></VALUE.NAMEDINSTANCE>");
 };
 
-TEST_F(WbemUsers, NobodyElseIsServed) {
+TEST_F(WbemUsers, OthersAreNotServed) {
     EXPECT_EQ(statusOf(ada), 200U);
     EXPECT_EQ(statusOf(bob), 200U);
     EXPECT_EQ(statusOf(ada), 200U);  // remembered
@@ -55,7 +55,7 @@ TEST_F(WbemUsers, NobodyElseIsServed) {
     EXPECT_EQ(statusOf("Authorization: Bearer secret\r\n"), 401U);
     EXPECT_EQ(statusOf(ada + ada), 400U);
     EXPECT_THAT(server.log(wbem::LogKind::refusal),
-                ElementsAre("refused nobody from 127.0.0.1, refusal number 1",
+                ElementsAre("refused a client without credentials from 127.0.0.1, refusal number 1",
                             "refused user ada from 127.0.0.1, refusal number 2",
                             "refused an unknown user from 127.0.0.1, refusal number 3",
                             "refused an unknown user from 127.0.0.1, refusal number 4"));
@@ -116,7 +116,7 @@ TEST_F(WbemUsers, NoSecretIsLogged) {
     }
 }
 
-TEST(WbemReadOnly, NobodyModifies) {
+TEST(WbemReadOnly, RefusesToModify) {
     wbem::ServerSettings settings;
     settings.readOnly = true;
     TestServer server(settings);

@@ -20,7 +20,7 @@ class UsersFile : public testing::Test {
         ASSERT_EQ(::chmod(file.c_str(), mode), 0);
     }
 
-    [[nodiscard]] std::string complaint() const {
+    [[nodiscard]] std::string failure() const {
         try {
             static_cast<void>(readUsers(file));
         } catch (const UsersError& error) {
@@ -47,28 +47,28 @@ TEST_F(UsersFile, IsReadLineByLine) {
 }
 
 TEST_F(UsersFile, WithAFaultIsRefusedWithItsLine) {
-    EXPECT_EQ(complaint(), "No such file or directory");
+    EXPECT_EQ(failure(), "No such file or directory");
     write("ada:modify:$y$a\nada\n");
-    EXPECT_EQ(complaint(), "line 2: not of the form NAME:ROLE:HASH");
+    EXPECT_EQ(failure(), "line 2: not of the form NAME:ROLE:HASH");
     write("ada:admin:$y$a\n");
-    EXPECT_EQ(complaint(), "line 1: not of the form NAME:ROLE:HASH");
+    EXPECT_EQ(failure(), "line 1: not of the form NAME:ROLE:HASH");
     write("ada:read:password\n");
-    EXPECT_EQ(complaint(), "line 1: not of the form NAME:ROLE:HASH");
+    EXPECT_EQ(failure(), "line 1: not of the form NAME:ROLE:HASH");
     write("a b:read:$y$a\n");
-    EXPECT_EQ(complaint(), "line 1: not of the form NAME:ROLE:HASH");
+    EXPECT_EQ(failure(), "line 1: not of the form NAME:ROLE:HASH");
     write("ada:read:$y$a\nada:read:$y$b\n");
-    EXPECT_EQ(complaint(), "line 2: user ada is there twice");
+    EXPECT_EQ(failure(), "line 2: user ada is there twice");
     write("# nobody\n");
-    EXPECT_EQ(complaint(), "names no user; \"cimdhcp user add\" adds one");
+    EXPECT_EQ(failure(), "names no user; \"cimdhcp user add\" adds one");
 }
 
 TEST_F(UsersFile, ThatOthersCanReachIsRefused) {
     for (const ::mode_t bad : {0644U, 0660U, 0602U, 0601U}) {
         write("ada:read:$y$a\n", bad);
-        EXPECT_EQ(complaint(), "may be read or written by others; \"chmod 640\" mends that");
+        EXPECT_EQ(failure(), "may be read or written by others; \"chmod 640\" mends that");
     }
     write("ada:read:$y$a\n", 0640);
-    EXPECT_EQ(complaint(), "none");
+    EXPECT_EQ(failure(), "none");
 }
 
 TEST_F(UsersFile, IsMadeForItsOwnerAlone) {

@@ -1,4 +1,4 @@
-#include "wbem/EnumerationSessions.h"
+#include "operations/EnumerationSessions.h"
 
 #include <gtest/gtest.h>
 

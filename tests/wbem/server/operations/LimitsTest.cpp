@@ -9,7 +9,7 @@
 namespace cimom::wbem {
 
 template <typename Change>
-std::string complaint(Change&& change) {
+std::string failure(Change&& change) {
     Limits limits;
     change(limits);
     try {
@@ -21,12 +21,12 @@ std::string complaint(Change&& change) {
 }
 
 TEST(Limits, AreGoodByDefault) {
-    EXPECT_EQ(complaint([](Limits&) {}), "none");
+    EXPECT_EQ(failure([](Limits&) {}), "none");
 }
 
 TEST(Limits, CannotBeSwitchedOffByZero) {
     const auto number = [](std::size_t Limits::*limit) {
-        return complaint([limit](Limits& limits) { limits.*limit = 0; });
+        return failure([limit](Limits& limits) { limits.*limit = 0; });
     };
     EXPECT_EQ(number(&Limits::headerLine), "max-header-line is 0; it may be 64 to 65536");
     EXPECT_EQ(number(&Limits::headers), "max-headers is 0; it may be 256 to 262144");
@@ -39,30 +39,30 @@ TEST(Limits, CannotBeSwitchedOffByZero) {
     EXPECT_EQ(number(&Limits::ioThreads), "io-threads is 0; it may be 1 to 64");
     EXPECT_EQ(number(&Limits::waiting), "max-waiting is 0; it may be 1 to 65536");
     const auto seconds = [](std::chrono::seconds Limits::*limit, int value) {
-        return complaint([=](Limits& limits) { limits.*limit = std::chrono::seconds(value); });
+        return failure([=](Limits& limits) { limits.*limit = std::chrono::seconds(value); });
     };
     EXPECT_EQ(seconds(&Limits::request, 0), "request-timeout is 0; it may be 1 to 86400");
-    EXPECT_EQ(seconds(&Limits::answer, 0), "answer-timeout is 0; it may be 1 to 86400");
-    EXPECT_NE(seconds(&Limits::answer, -1), "none");
-    EXPECT_EQ(complaint([](Limits& limits) { limits.sessions.sessions = 0; }),
+    EXPECT_EQ(seconds(&Limits::response, 0), "answer-timeout is 0; it may be 1 to 86400");
+    EXPECT_NE(seconds(&Limits::response, -1), "none");
+    EXPECT_EQ(failure([](Limits& limits) { limits.sessions.sessions = 0; }),
               "max-enumerations is 0; it may be 1 to 65536");
     EXPECT_EQ(
-        complaint([](Limits& limits) { limits.sessions.defaultTimeout = std::chrono::seconds(0); }),
+        failure([](Limits& limits) { limits.sessions.defaultTimeout = std::chrono::seconds(0); }),
         "enumeration-timeout is 0; it may be 1 to 86400");
     EXPECT_EQ(
-        complaint([](Limits& limits) { limits.sessions.longestTimeout = std::chrono::seconds(0); }),
+        failure([](Limits& limits) { limits.sessions.longestTimeout = std::chrono::seconds(0); }),
         "max-enumeration-timeout is 0; it may be 1 to 86400");
 }
 
 TEST(Limits, HaveAnUpperEnd) {
-    EXPECT_EQ(complaint([](Limits& limits) { limits.depth = 256; }), "none");
-    EXPECT_EQ(complaint([](Limits& limits) { limits.depth = 257; }),
+    EXPECT_EQ(failure([](Limits& limits) { limits.depth = 256; }), "none");
+    EXPECT_EQ(failure([](Limits& limits) { limits.depth = 257; }),
               "max-depth is 257; it may be 8 to 256");
-    EXPECT_EQ(complaint([](Limits& limits) { limits.connections = 1; }),
+    EXPECT_EQ(failure([](Limits& limits) { limits.connections = 1; }),
               "max-connections is below io-threads");
 }
 
-std::string settingsComplaint(const ServerSettings& settings) {
+std::string settingsFailure(const ServerSettings& settings) {
     try {
         checkSettings(settings);
     } catch (const ServerError& error) {
@@ -73,30 +73,30 @@ std::string settingsComplaint(const ServerSettings& settings) {
 
 TEST(ServerSettings, OnlyThisMachineIsServedWithoutTlsAndUsers) {
     ServerSettings settings;
-    EXPECT_EQ(settingsComplaint(settings), "none");
+    EXPECT_EQ(settingsFailure(settings), "none");
     settings.address = "127.3.2.1";
-    EXPECT_EQ(settingsComplaint(settings), "none");
+    EXPECT_EQ(settingsFailure(settings), "none");
     settings.address = "::1";
-    EXPECT_EQ(settingsComplaint(settings), "none");
+    EXPECT_EQ(settingsFailure(settings), "none");
     for (const char* address : {"0.0.0.0", "::", "192.0.2.1", "2001:db8::1", "::ffff:127.0.0.1"}) {
         settings.address = address;
-        EXPECT_EQ(settingsComplaint(settings),
+        EXPECT_EQ(settingsFailure(settings),
                   std::string(address) +
                       " can be reached from other machines: this needs TLS (--tls-cert and "
                       "--tls-key), or passwords could be read on the way");
     }
     settings.tls.emplace();
-    EXPECT_EQ(settingsComplaint(settings),
+    EXPECT_EQ(settingsFailure(settings),
               "::ffff:127.0.0.1 can be reached from other machines: this needs users (--users, "
               "made by \"cimdhcp user add\"), or anybody could use it");
     settings.users.emplace();
-    EXPECT_EQ(settingsComplaint(settings), "none");
+    EXPECT_EQ(settingsFailure(settings), "none");
 }
 
 TEST(ServerSettings, NeedANumericAddress) {
     ServerSettings settings;
     settings.address = "localhost";
-    EXPECT_EQ(settingsComplaint(settings), "\"localhost\" is no IPv4 or IPv6 address");
+    EXPECT_EQ(settingsFailure(settings), "\"localhost\" is not an IPv4 or IPv6 address");
 }
 
 }  // namespace cimom::wbem

@@ -20,7 +20,7 @@ class WbemOperations : public testing::Test {
         return errorOf(server.call(method, parameters, nameSpace));
     }
 
-    /// The texts of the paths that an operation answers.
+    /// The texts of the paths that an operation returns.
     std::vector<std::string> paths(const std::string& method, const std::string& parameters) {
         std::vector<std::string> texts;
         for (const wbem::XmlElement& element : returned(server.call(method, parameters))) {
@@ -205,7 +205,7 @@ TEST_F(WbemOperations, AssociationsKeepToEveryFilter) {
     EXPECT_THAT(propertiesOf(wbem::readInstance(listed[0].children.at(1))), ElementsAre("Id"));
 }
 
-TEST_F(WbemOperations, HostAndNamespaceStandInTheAnswersOfAssociations) {
+TEST_F(WbemOperations, HostAndNamespaceStandInTheResultsOfAssociations) {
     const auto found = returned(
         server.call("AssociatorNames", parameter("ObjectName", instanceName("Test_Left", "l2"))));
     ASSERT_FALSE(found.empty());
@@ -277,9 +277,9 @@ TEST_F(WbemOperations, EveryFailureHasTheStatusOfTheStandard) {
     EXPECT_EQ(failure("EnumerateInstances", left + valueParameter("Colour", "blue")),
               "4 there is no parameter Colour");
     EXPECT_EQ(failure("EnumerateInstances", left + valueParameter("DeepInheritance", "maybe")),
-              "4 parameter DeepInheritance is no boolean");
+              "4 parameter DeepInheritance is not a boolean");
     EXPECT_EQ(failure("EnumerateInstances", valueParameter("ClassName", "Test_Left")),
-              "4 parameter ClassName is no CLASSNAME");
+              "4 parameter ClassName is not CLASSNAME");
     EXPECT_EQ(failure("Associators", parameter("ObjectName", "<VALUE/>")),
               "4 parameter ObjectName is neither INSTANCENAME nor CLASSNAME");
     EXPECT_EQ(failure("GetInstance",
@@ -287,7 +287,7 @@ TEST_F(WbemOperations, EveryFailureHasTheStatusOfTheStandard) {
                                 "<INSTANCENAME CLASSNAME=\"Test_Numbered\"><KEYBINDING "
                                 "NAME=\"Number\"><KEYVALUE VALUETYPE=\"numeric\">70000</KEYVALUE>"
                                 "</KEYBINDING></INSTANCENAME>")),
-              "4 key Number is no uint16");
+              "4 key Number is not of type uint16");
     EXPECT_EQ(failure("GetInstance", parameter("InstanceName",
                                                "<INSTANCENAME CLASSNAME=\"Test_Link\"><KEYVALUE>x"
                                                "</KEYVALUE></INSTANCENAME>")),
@@ -312,9 +312,9 @@ TEST_F(WbemOperations, WhatIsNotServedSaysSo) {
         "<SIMPLEREQ><METHODCALL NAME='RequestStateChange'><LOCALCLASSPATH/></METHODCALL>"
         "</SIMPLEREQ></MESSAGE></CIM>";
     const HttpResponse response = server.ask(httpRequest("RequestStateChange", body));
-    const wbem::XmlElement answer = responseOf(response.body);
-    EXPECT_EQ(answer.name, "METHODRESPONSE");
-    EXPECT_EQ(errorOf(answer), "7 the operation RequestStateChange is not offered");
+    const wbem::XmlElement element = responseOf(response.body);
+    EXPECT_EQ(element.name, "METHODRESPONSE");
+    EXPECT_EQ(errorOf(element), "7 the operation RequestStateChange is not offered");
 }
 
 TEST_F(WbemOperations, ResultsOfManyThreadsArriveWhole) {

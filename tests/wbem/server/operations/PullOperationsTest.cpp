@@ -134,7 +134,7 @@ TEST_F(WbemPull, WhatIsNotOfferedHasItsStatus) {
     EXPECT_EQ(failure("OpenEnumerateInstances", left + valueParameter("OperationTimeout", "600")),
               "");
     EXPECT_EQ(failure("OpenEnumerateInstances", left + valueParameter("MaxObjectCount", "-1")),
-              "4 parameter MaxObjectCount is no uint32");
+              "4 parameter MaxObjectCount is not a uint32");
     EXPECT_EQ(failure("PullInstances", valueParameter("EnumerationContext", "x")),
               "4 parameter MaxObjectCount is missing");
     EXPECT_EQ(failure("OpenEnumerateInstances", left + valueParameter("LocalOnly", "TRUE")),

@@ -1,4 +1,4 @@
-#include "wbem/Spool.h"
+#include "operations/Spool.h"
 
 #include <gtest/gtest.h>
 

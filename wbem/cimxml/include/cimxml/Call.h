@@ -31,16 +31,16 @@ struct Call {
 };
 
 /// Reads the body of a request: one CIM element with a simple request (DSP0201,
-/// 5.6). Throws HttpFailure with what DSP0200, 7.3.4 has a server answer to
+/// 5.6). Throws HttpFailure with the response that DSP0200, 7.3.4 has for
 /// anything else.
 [[nodiscard]] Call readCall(std::string_view body, std::size_t maximumDepth);
 
 /// What stands before and behind the result of a successful call.
-[[nodiscard]] std::string answerHead(const Call& call);
-[[nodiscard]] std::string answerTail(const Call& call);
-/// The whole answer of a call that ended with a status. An empty description
+[[nodiscard]] std::string responseHead(const Call& call);
+[[nodiscard]] std::string responseTail(const Call& call);
+/// The whole response to a call that ended with a status. An empty description
 /// becomes the status' name.
-[[nodiscard]] std::string errorAnswer(const Call& call, unsigned code,
-                                      std::string_view description);
+[[nodiscard]] std::string errorResponse(const Call& call, unsigned code,
+                                        std::string_view description);
 
 }  // namespace cimom::wbem

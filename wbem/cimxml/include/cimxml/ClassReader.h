@@ -1,6 +1,6 @@
 #pragma once
 
-#include "cimom/ClassRepository.h"
+#include "cimom/ClassDeclaration.h"
 #include "cimxml/XmlDocument.h"
 
 namespace cimom::wbem {

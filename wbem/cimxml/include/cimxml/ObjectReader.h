@@ -3,7 +3,7 @@
 #include <string>
 #include <vector>
 
-#include "cimom/Cim.h"
+#include "cimom/Instance.h"
 #include "cimxml/XmlDocument.h"
 
 /// Reads the elements of DSP0201 into the model. Attributes that have no meaning

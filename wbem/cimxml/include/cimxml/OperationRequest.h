@@ -5,7 +5,7 @@
 #include <string_view>
 #include <vector>
 
-#include "cimom/Cim.h"
+#include "cimom/Instance.h"
 
 namespace cimom::wbem {
 

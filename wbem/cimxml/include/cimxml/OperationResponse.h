@@ -5,12 +5,12 @@
 #include <string_view>
 #include <vector>
 
-#include "cimom/Cim.h"
+#include "cimom/Instance.h"
 #include "cimxml/XmlDocument.h"
 
 namespace cimom::wbem {
 
-/// What a server answered to an intrinsic operation.
+/// The response of a server to an intrinsic operation.
 struct OperationResponse {
     unsigned code = 0;                 ///< the CIM status; 0: OK
     std::string description;           ///< of a status that is not OK
@@ -21,7 +21,7 @@ struct OperationResponse {
 
 /// Reads the response to an operation of that name (DSP0201, 5.6). Versions and the
 /// message's ID may be any, since servers disagree about them. Throws XmlError, and
-/// NotValid for anything that is no such response.
+/// NotValid for anything that is not such a response.
 [[nodiscard]] OperationResponse readResponse(std::string_view body, std::string_view method,
                                              std::size_t maximumDepth);
 

@@ -2,7 +2,7 @@
 
 #include <string>
 
-#include "cimom/Cim.h"
+#include "cimom/Instance.h"
 
 namespace cimom::wbem {
 

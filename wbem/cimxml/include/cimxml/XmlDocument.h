@@ -23,7 +23,7 @@ struct XmlElement {
     bool operator==(const XmlElement&) const = default;
 };
 
-/// A text that is no acceptable XML document; what() tells line and reason.
+/// A text that is not an acceptable XML document; what() tells line and reason.
 class XmlError : public std::runtime_error {
   public:
     using std::runtime_error::runtime_error;

@@ -7,7 +7,7 @@ namespace cimom::wbem {
 
 /// Appends a text as character data of an element. Carriage returns are written as
 /// references, since a reader takes bare ones for line ends. What XML 1.0 cannot
-/// hold (most control characters, U+FFFE, U+FFFF, bytes that are no UTF-8) becomes
+/// hold (most control characters, U+FFFE, U+FFFF, bytes that are not UTF-8) becomes
 /// U+FFFD, so that no value can spoil the document around it.
 void appendText(std::string& out, std::string_view text);
 

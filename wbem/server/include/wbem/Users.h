@@ -11,7 +11,7 @@ namespace cimom::wbem {
 
 enum class Role { read, modify };
 
-/// Somebody who may use the server.
+/// A person or program that may use the server.
 struct User {
     std::string name;
     Role role = Role::read;
@@ -33,7 +33,7 @@ class UsersError : public std::runtime_error {
 
 /// Reads lines NAME:ROLE:HASH, "#" comments. Throws UsersError, also for a file
 /// that others than its owner and group can read or that others than its owner can
-/// write, and for one that names nobody.
+/// write, and for one without users.
 [[nodiscard]] std::vector<User> readUsers(const std::filesystem::path& file);
 
 /// Adds a user to the file, which is made if need be, or changes role and

@@ -1,8 +1,8 @@
-#include "operations/Answer.h"
+#include "operations/ResponseBody.h"
 
 namespace cimom::wbem {
 
-void Answer::write(std::string& out, std::size_t size) {
+void ResponseBody::write(std::string& out, std::size_t size) {
     if (ended_) {
         return;
     }

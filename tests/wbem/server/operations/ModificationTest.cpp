@@ -1,4 +1,4 @@
-#include "operations/ModificationText.h"
+#include "operations/Modification.h"
 
 #include <gtest/gtest.h>
 
@@ -13,7 +13,7 @@ Modification modification() {
     return made;
 }
 
-TEST(ModificationText, TellsWhoDidWhat) {
+TEST(Modification, TellsWhoDidWhat) {
     Modification made = modification();
     made.caller.user = "ada";
     made.changes = {
@@ -25,7 +25,7 @@ TEST(ModificationText, TellsWhoDidWhat) {
               R"("new" N: unknown -> {1, null} status=OK)");
 }
 
-TEST(ModificationText, TellsWhyItWasNotDone) {
+TEST(Modification, TellsWhyItWasNotDone) {
     Modification made = modification();
     made.status = 2;
     made.description = "this needs the right to modify";
@@ -34,7 +34,7 @@ TEST(ModificationText, TellsWhyItWasNotDone) {
               "status=CIM_ERR_ACCESS_DENIED (this needs the right to modify)");
 }
 
-TEST(ModificationText, ShortensLongValues) {
+TEST(Modification, ShortensLongValues) {
     Modification made = modification();
     made.changes = {
         {"Name", Value::null(Type::string, false), Value::ofString(std::string(9000, 'x'))}};

@@ -1,4 +1,4 @@
-#include "operations/Answer.h"
+#include "operations/ResponseBody.h"
 
 #include <gtest/gtest.h>
 
@@ -6,40 +6,40 @@
 
 namespace cimom::wbem {
 
-TEST(Answer, IsWrittenPieceByPiece) {
+TEST(ResponseBody, IsWrittenPieceByPiece) {
     int left = 5;
-    Answer answer(
+    ResponseBody response(
         "<", [&left](std::string& out) { return left-- > 0 ? (out += "item", true) : false; }, ">");
     std::string out;
-    answer.write(out, 8);
+    response.write(out, 8);
     EXPECT_EQ(out, "<itemitem");
-    EXPECT_FALSE(answer.ended());
+    EXPECT_FALSE(response.ended());
     out.clear();
-    answer.write(out, 8);
+    response.write(out, 8);
     EXPECT_EQ(out, "itemitem");
     out.clear();
-    answer.write(out, 1000);
+    response.write(out, 1000);
     EXPECT_EQ(out, "item>");
-    EXPECT_TRUE(answer.ended());
-    answer.write(out, 1000);
+    EXPECT_TRUE(response.ended());
+    response.write(out, 1000);
     EXPECT_EQ(out, "item>");
 }
 
-TEST(Answer, AtHandIsWrittenWhole) {
-    Answer answer("all of it");
+TEST(ResponseBody, AtHandIsWrittenWhole) {
+    ResponseBody response("all of it");
     std::string out;
-    answer.write(out, 1);
+    response.write(out, 1);
     EXPECT_EQ(out, "all of it");
-    EXPECT_TRUE(answer.ended());
+    EXPECT_TRUE(response.ended());
 }
 
-TEST(Answer, LetsGoOfItsObjectsAtTheEnd) {
+TEST(ResponseBody, LetsGoOfItsObjectsAtTheEnd) {
     auto object = std::make_shared<int>(1);
     const std::weak_ptr<int> watched = object;
-    Answer answer(
+    ResponseBody response(
         "", [held = std::move(object)](std::string&) { return false; }, "");
     std::string out;
-    answer.write(out, 1);
+    response.write(out, 1);
     EXPECT_TRUE(watched.expired());
 }
 

@@ -10,7 +10,8 @@
 #include <string>
 #include <unordered_map>
 
-#include "wbem/Spool.h"
+#include "operations/Spool.h"
+#include "wbem/Limits.h"
 
 namespace cimom::wbem {
 
@@ -23,19 +24,11 @@ struct EnumerationSession {
     std::size_t position = 0;              ///< of the next one
     std::size_t left = 0;                  ///< objects that are still to come
     std::chrono::seconds timeout{0};       ///< of silence, after which it is forgotten
-    std::optional<std::string> user;       ///< who opened it; nobody else may go on
-};
-
-struct SessionLimits {
-    std::size_t sessions = 64;  ///< open at the same time
-    std::chrono::seconds defaultTimeout{60};
-    std::chrono::seconds longestTimeout{600};
-
-    bool operator==(const SessionLimits&) const = default;
+    std::optional<std::string> user;       ///< who opened it; no other user may go on
 };
 
 /// The open enumeration sessions of a server, by the contexts that clients hold.
-/// Contexts are random numbers of 128 bits, which nobody can guess. Sessions that
+/// Contexts are random numbers of 128 bits, which cannot be guessed. Sessions that
 /// were silent for too long are forgotten. Safe for concurrent use.
 class EnumerationSessions {
   public:

@@ -7,16 +7,16 @@
 
 namespace cimom::wbem {
 
-/// The body of an answer, which is written piece by piece: the XML of a long
+/// The body of a response, which is written piece by piece: the XML of a long
 /// result is never held as a whole. Used by one thread at a time.
-class Answer {
+class ResponseBody {
   public:
     /// Appends the next piece; false, without appending, when there is none.
     using Items = std::function<bool(std::string&)>;
 
     /// A body that is at hand.
-    explicit Answer(std::string whole) : head_(std::move(whole)) {}
-    Answer(std::string head, Items items, std::string tail)
+    explicit ResponseBody(std::string whole) : head_(std::move(whole)) {}
+    ResponseBody(std::string head, Items items, std::string tail)
         : head_(std::move(head)), items_(std::move(items)), tail_(std::move(tail)) {}
 
     /// Appends to `out` until that has at least `size` bytes or the body ends.

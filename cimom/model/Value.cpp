@@ -1,10 +1,12 @@
-#include "cimom/Cim.h"
+#include "cimom/Value.h"
 
 #include <algorithm>
 #include <array>
 #include <utility>
 
+#include "cimom/Instance.h"
 #include "cimom/Names.h"
+#include "cimom/ObjectPath.h"
 
 namespace cimom {
 
@@ -64,13 +66,6 @@ bool sameScalar(const Scalar& a, const Scalar& b) {
     return a == b;
 }
 
-const Value* findValue(const std::vector<NamedValue>& values, std::string_view name) noexcept {
-    const auto found = std::find_if(values.begin(), values.end(), [name](const NamedValue& entry) {
-        return sameName(entry.name, name);
-    });
-    return found == values.end() ? nullptr : &found->value;
-}
-
 }  // namespace
 
 std::string_view typeName(Type type) noexcept {
@@ -83,11 +78,6 @@ std::optional<Type> typeFromName(std::string_view name) noexcept {
         return sameName(entry.name, name);
     });
     return found == types.end() ? std::nullopt : std::optional(found->type);
-}
-
-bool sameName(std::string_view a, std::string_view b) noexcept {
-    return std::equal(a.begin(), a.end(), b.begin(), b.end(),
-                      [](char x, char y) { return lowered(x) == lowered(y); });
 }
 
 bool Value::isNull() const noexcept {
@@ -124,50 +114,11 @@ bool Value::operator==(const Value& other) const {
     return here != nullptr && there != nullptr && sameScalar(*here, *there);
 }
 
-const Value* ObjectPath::key(std::string_view name) const noexcept {
-    return findValue(keys, name);
-}
-
-bool ObjectPath::operator==(const ObjectPath& other) const {
-    const bool sameHost = host.empty() || other.host.empty() || sameName(host, other.host);
-    if (!sameHost || !sameName(nameSpace, other.nameSpace) ||
-        !sameName(className, other.className) || keys.size() != other.keys.size()) {
-        return false;
-    }
-    return std::is_permutation(keys.begin(), keys.end(), other.keys.begin(),
-                               [](const NamedValue& a, const NamedValue& b) {
-                                   return sameName(a.name, b.name) && a.value == b.value;
-                               });
-}
-
-const Value* Instance::property(std::string_view name) const noexcept {
-    return findValue(properties, name);
-}
-
-std::string_view statusName(CMPIrc code) noexcept {
-    // Indexed by the code; the names of the CIM status codes are those of DSP0200, 5.2.7.
-    static constexpr std::array<std::string_view, 18> names{
-        "OK",
-        "CIM_ERR_FAILED",
-        "CIM_ERR_ACCESS_DENIED",
-        "CIM_ERR_INVALID_NAMESPACE",
-        "CIM_ERR_INVALID_PARAMETER",
-        "CIM_ERR_INVALID_CLASS",
-        "CIM_ERR_NOT_FOUND",
-        "CIM_ERR_NOT_SUPPORTED",
-        "CIM_ERR_CLASS_HAS_CHILDREN",
-        "CIM_ERR_CLASS_HAS_INSTANCES",
-        "CIM_ERR_INVALID_SUPERCLASS",
-        "CIM_ERR_ALREADY_EXISTS",
-        "CIM_ERR_NO_SUCH_PROPERTY",
-        "CIM_ERR_TYPE_MISMATCH",
-        "CIM_ERR_QUERY_LANGUAGE_NOT_SUPPORTED",
-        "CIM_ERR_INVALID_QUERY",
-        "CIM_ERR_METHOD_NOT_AVAILABLE",
-        "CIM_ERR_METHOD_NOT_FOUND",
-    };
-    const auto index = static_cast<std::size_t>(code);
-    return index < names.size() ? names.at(index) : names[1];
+const Value* findValue(const std::vector<NamedValue>& values, std::string_view name) noexcept {
+    const auto found = std::find_if(values.begin(), values.end(), [name](const NamedValue& entry) {
+        return sameName(entry.name, name);
+    });
+    return found == values.end() ? nullptr : &found->value;
 }
 
 }  // namespace cimom

@@ -1,8 +1,7 @@
-#include "operations/ModificationText.h"
+#include "operations/Modification.h"
 
 #include "cimom/ObjectPathText.h"
 #include "cimxml/Errors.h"
-#include "cimxml/ScalarText.h"
 
 namespace cimom::wbem {
 
@@ -10,26 +9,10 @@ namespace {
 
 constexpr std::size_t longest = 200;
 
-std::string scalarText(Type type, const Scalar& scalar) {
-    if (std::holds_alternative<std::monostate>(scalar)) {
-        return "null";
-    }
-    if (const auto* const text = std::get_if<std::string>(&scalar)) {
-        std::string quoted = "\"";
-        for (const char letter : *text) {
-            if (letter == '"' || letter == '\\') {
-                quoted += '\\';
-            }
-            quoted += letter;
-        }
-        return quoted + '"';
-    }
-    if (const auto* const path = std::get_if<std::shared_ptr<const ObjectPath>>(&scalar)) {
-        return toText(**path);
-    }
-    std::string text;
-    appendScalarText(text, type, scalar);
-    return text.empty() ? "an instance" : text;
+std::string textOf(const Scalar& scalar) {
+    return std::holds_alternative<std::monostate>(scalar)
+               ? "null"
+               : scalarText(scalar).value_or("an instance");
 }
 
 std::string valueText(const Value& value) {
@@ -39,11 +22,11 @@ std::string valueText(const Value& value) {
     }
     if (const Array* const elements = value.array()) {
         for (const Scalar& element : *elements) {
-            text += (text.empty() ? "{" : ", ") + scalarText(value.type, element);
+            text += (text.empty() ? "{" : ", ") + textOf(element);
         }
         text = text.empty() ? "{}" : text + '}';
     } else {
-        text = scalarText(value.type, *value.scalar());
+        text = textOf(*value.scalar());
     }
     if (text.size() > longest) {
         text = text.substr(0, longest) + "...";

@@ -1,8 +1,5 @@
 #pragma once
 
-#include <cmpidt.h>
-
-#include <compare>
 #include <cstdint>
 #include <memory>
 #include <optional>
@@ -77,46 +74,8 @@ struct NamedValue {
     bool operator==(const NamedValue&) const = default;
 };
 
-/// Names compare without regard to case (ASCII).
-[[nodiscard]] bool sameName(std::string_view a, std::string_view b) noexcept;
-
-/// The path of an instance, or of a class when it has no keys.
-struct ObjectPath {
-    std::string host;       ///< empty: none
-    std::string nameSpace;  ///< without leading slash; empty: none
-    std::string className;
-    std::vector<NamedValue> keys;  ///< in the order given
-
-    [[nodiscard]] const Value* key(std::string_view name) const noexcept;
-
-    /// DSP0004 equality: names without regard to case, keys in any order, string
-    /// values exactly. An empty host equals any other.
-    bool operator==(const ObjectPath& other) const;
-};
-
-struct Instance {
-    ObjectPath path;  ///< its class name is the instance's class
-    std::vector<NamedValue> properties;
-
-    [[nodiscard]] const Value* property(std::string_view name) const noexcept;
-
-    bool operator==(const Instance&) const = default;
-};
-
-/// What an operation ended with; the codes are those of CMPI, 1 to 17 of which
-/// are the CIM status codes.
-struct Status {
-    CMPIrc code = CMPI_RC_OK;
-    std::string message;
-    /// The provider could not be had: its library cannot be loaded, or its factory gave none.
-    bool noProvider = false;
-
-    [[nodiscard]] bool ok() const noexcept { return code == CMPI_RC_OK; }
-    bool operator==(const Status&) const = default;
-};
-
-/// "CIM_ERR_NOT_FOUND" and so on; "OK" for 0, "CIM_ERR_FAILED" for codes that
-/// have no CIM counterpart.
-[[nodiscard]] std::string_view statusName(CMPIrc code) noexcept;
+/// The first value of that name; null when there is none.
+[[nodiscard]] const Value* findValue(const std::vector<NamedValue>& values,
+                                     std::string_view name) noexcept;
 
 }  // namespace cimom
