@@ -36,8 +36,8 @@ constexpr std::array<ElementProperty<Element>, 9> instanceProperties{{
 const RowSource DHCPSettingDataRow::trace{
     {"CMPI/CMPIDHCPSettingData", loggerCMPIDHCPSettingData}, "~CMPIDHCPSettingData", __LINE__};
 
-const ElementClass<Element> DHCPSettingDataRow::elementClass{"QVXZR_DHCPSettingData", filterKeys,
-                                                             pathKeys, instanceProperties};
+const ElementClass<Element> DHCPSettingDataRow::elementClass{filterKeys, pathKeys,
+                                                             instanceProperties};
 
 CMPIStatus DHCPSettingDataRow::modify(const Element& element, const CMPIInstance* newInstance) {
     if (newInstance == nullptr) {

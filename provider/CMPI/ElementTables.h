@@ -41,7 +41,6 @@ struct ElementProperty {
 /// All that distinguishes one element class from the others. Of static lifetime.
 template <typename Element>
 struct ElementClass {
-    const char* name;
     std::span<const FilterKey<Element>> filterKeys;
     std::span<const PathKey<Element>> pathKeys;
     std::span<const ElementProperty<Element>> properties;

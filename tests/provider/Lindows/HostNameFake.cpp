@@ -7,7 +7,7 @@
 
 namespace {
 
-bool fails = false;
+test::HostName behaviour = test::HostName::real;
 
 }  // namespace
 
@@ -17,9 +17,13 @@ extern "C" int __real_gethostname(char* name, std::size_t size);
 extern "C" int __wrap_gethostname(char* name, std::size_t size);
 
 int __wrap_gethostname(char* name, std::size_t size) {
-    if (fails) {
+    if (behaviour == test::HostName::fails) {
         errno = EFAULT;
         return -1;
+    }
+    if (behaviour == test::HostName::isEmpty && size > 0) {
+        *name = '\0';
+        return 0;
     }
     return __real_gethostname(name, size);
 }
@@ -27,13 +31,12 @@ int __wrap_gethostname(char* name, std::size_t size) {
 
 namespace test {
 
-HostNameFails::HostNameFails() {
-    // The machine itself is not read without its name.
+FakeHostName::FakeHostName(HostName fake) {
     static_cast<void>(ZR::InstrumentationService::process().current());
-    fails = true;
+    behaviour = fake;
 }
-HostNameFails::~HostNameFails() {
-    fails = false;
+FakeHostName::~FakeHostName() {
+    behaviour = HostName::real;
 }
 
 }  // namespace test

@@ -1,16 +1,29 @@
 #pragma once
 
 /// The kernel's gethostname does not fail on its own, so this one, linked in its
-/// place, fails on demand and asks the kernel otherwise.
+/// place, fails or tells an empty name on demand and asks the kernel otherwise.
 namespace test {
 
-class HostNameFails {
+enum class HostName { real, fails, isEmpty };
+
+/// What gethostname does from here on, until the end of the object; the tree that was
+/// set is read before.
+class FakeHostName {
   public:
-    /// From here on; the tree that was set is read before.
-    HostNameFails();
-    ~HostNameFails();
-    HostNameFails(const HostNameFails&) = delete;
-    HostNameFails& operator=(const HostNameFails&) = delete;
+    explicit FakeHostName(HostName behaviour);
+    ~FakeHostName();
+    FakeHostName(const FakeHostName&) = delete;
+    FakeHostName& operator=(const FakeHostName&) = delete;
+};
+
+class HostNameFails : public FakeHostName {
+  public:
+    HostNameFails() : FakeHostName(HostName::fails) {}
+};
+
+class HostNameIsEmpty : public FakeHostName {
+  public:
+    HostNameIsEmpty() : FakeHostName(HostName::isEmpty) {}
 };
 
 }  // namespace test
