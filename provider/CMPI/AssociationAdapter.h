@@ -86,7 +86,7 @@ struct AssociationClass {
 ///
 /// An association adapter is built for one request from the path that the client
 /// names, and walked: operator bool is asked exactly once per step. What it hands
-/// out belongs to the broker, which may also refuse: the answer is then null.
+/// out belongs to the broker, which may also refuse: the result is then null.
 /// Exceptions of its ends and of its record pass. Used by one thread.
 ///
 /// A row has the types First, Second (adapters of the ends) and Record and, as static
@@ -148,7 +148,7 @@ class AssociationAdapter {
         return requestedClassId_ == servedClass.id ? Source::association : Source::none;
     }
 
-    /// What `ask` answers of the end that is far from the source; null without one.
+    /// What `ask` returns for the end that is far from the source; null without one.
     template <typename Ask>
     auto askFarEnd(const Ask& ask) {
         switch (source()) {

@@ -43,7 +43,7 @@ CMPIStatus DHCPSettingDataRow::modify(const Element& element, const CMPIInstance
     if (newInstance == nullptr) {
         return {CMPI_RC_ERR_FAILED, nullptr};
     }
-    // Absent, null or no text: the name is empty, and is written as such.
+    // Absent, null or not a text: the name is empty, and is written as such.
     std::string name;
     ProviderUtilities::getProperty(newInstance, "ConfigurationName", name, false);
     return {element.setConfigurationName(name) ? CMPI_RC_OK : CMPI_RC_ERR_FAILED, nullptr};

@@ -16,12 +16,12 @@ namespace ZR::DHCPClientProvider {
 ///
 /// An element adapter is built for one request and walked: while it is true, ask
 /// it for an object path or an instance, and step on. What it hands out belongs to
-/// the broker, which may also refuse: the answer is then null. It borrows broker
+/// the broker, which may also refuse: the result is then null. It borrows broker
 /// and context, and lets the exceptions of its element pass. Used by one thread.
 ///
 /// A row has the type Element and, as static members, Classes::Class servedClass,
 /// RowSource trace and ElementClass<Element> elementClass. One whose instances can be changed has
-/// modify(element, newInstance) besides, which answers a CMPIStatus.
+/// modify(element, newInstance) besides, which returns a CMPIStatus.
 template <typename Row>
 class ElementAdapter {
   public:

@@ -37,7 +37,7 @@ bool takeNext(const CMPIEnumeration* enumeration, CMPIInstance*& instance);
 CMPIObjectPath* pathOf(const CMPIInstance* instance);
 
 /// Fetches instances of one class from the object manager, which other providers
-/// serve, as ends of associations. What the object manager answers belongs to it
+/// serve, as ends of associations. What the object manager returns belongs to it
 /// and is never released here.
 ///
 /// Placed, the adapter stands on the first instance. It is walked so: the first
