@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <array>
 #include <exception>
+#include <string_view>
 
 #include "CMPI/CMPIDHCPCapabilities.h"
 #include "CMPI/CMPIDHCPElementCapabilities.h"
@@ -17,6 +18,7 @@
 #include "CMPI/CMPISAPSAPDependency.h"
 #include "Delivery.h"
 #include "include/TracePoint.h"
+#include "providerutilities/Classes.h"
 #include "providerutilities/ProviderUtilities.h"
 #include "zrclient/OneMoment.h"
 #include "zrlinux/LiveSource.h"
@@ -44,32 +46,30 @@ CMPIrc notSupported(const Request& /*request*/) {
 }
 
 template <typename Adapter, Ending names, Ending instances, Ending get>
-constexpr ServedClass served(unsigned short id) {
-    return {id, &deliverPaths<Adapter, names>, &deliverInstances<Adapter, instances>,
-            &deliverInstances<Adapter, get>};
+constexpr ServedClass served() {
+    return {Adapter::servedClass.id, &deliverPaths<Adapter, names>,
+            &deliverInstances<Adapter, instances>, &deliverInstances<Adapter, get>};
 }
 
 /// A class whose instances cannot be fetched singly.
 template <typename Adapter, Ending names, Ending instances>
-constexpr ServedClass enumerated(unsigned short id) {
-    return {id, &deliverPaths<Adapter, names>, &deliverInstances<Adapter, instances>,
-            &notSupported};
+constexpr ServedClass enumerated() {
+    return {Adapter::servedClass.id, &deliverPaths<Adapter, names>,
+            &deliverInstances<Adapter, instances>, &notSupported};
 }
 
-constexpr unsigned short settingDataId = 85;
-
 constexpr std::array servedClasses{
-    served<CMPIDHCPProtocolEndpoint, Ending::returnDone, Ending::returnDone, Ending::returnDone>(4),
-    served<CMPIDHCPCapabilities, Ending::returnDone, Ending::returnDone, Ending::returnDone>(5),
-    enumerated<CMPIDHCPElementCapabilities, Ending::returnDone, Ending::left>(6),
-    enumerated<CMPISAPSAPDependency, Ending::left, Ending::left>(8),
-    enumerated<CMPIDHCPHostedAccessPoint, Ending::returnDone, Ending::left>(34),
-    served<CMPIDHCPRemoteServiceAccessPoint, Ending::left, Ending::left, Ending::left>(82),
-    served<CMPIDHCPRemoteAccessAvailableToElement, Ending::left, Ending::left, Ending::left>(83),
-    served<CMPIDHCPRemoteHostedAccessPoint, Ending::left, Ending::left, Ending::left>(84),
-    served<CMPIDHCPSettingData, Ending::left, Ending::left, Ending::left>(settingDataId),
-    served<CMPIDHCPElementSettingData, Ending::left, Ending::left, Ending::left>(86),
-    served<CMPIDHCPOrderedComponent, Ending::left, Ending::left, Ending::left>(87),
+    served<CMPIDHCPProtocolEndpoint, Ending::returnDone, Ending::returnDone, Ending::returnDone>(),
+    served<CMPIDHCPCapabilities, Ending::returnDone, Ending::returnDone, Ending::returnDone>(),
+    enumerated<CMPIDHCPElementCapabilities, Ending::returnDone, Ending::left>(),
+    enumerated<CMPISAPSAPDependency, Ending::left, Ending::left>(),
+    enumerated<CMPIDHCPHostedAccessPoint, Ending::returnDone, Ending::left>(),
+    served<CMPIDHCPRemoteServiceAccessPoint, Ending::left, Ending::left, Ending::left>(),
+    served<CMPIDHCPRemoteAccessAvailableToElement, Ending::left, Ending::left, Ending::left>(),
+    served<CMPIDHCPRemoteHostedAccessPoint, Ending::left, Ending::left, Ending::left>(),
+    served<CMPIDHCPSettingData, Ending::left, Ending::left, Ending::left>(),
+    served<CMPIDHCPElementSettingData, Ending::left, Ending::left, Ending::left>(),
+    served<CMPIDHCPOrderedComponent, Ending::left, Ending::left, Ending::left>(),
 };
 
 /// The frame of an instance request: marks, the class identifier, and the one
@@ -141,7 +141,7 @@ CMPIStatus DHCPClient_ModifyInstance(CMPIInstanceMI* /*mi*/, const CMPIContext* 
                                      const CMPIInstance* instance, const char** /*properties*/) {
     const TracePoint at = ZR_HERE;
     return serve(at, path, [&](unsigned short classId, CMPIStatus& status) {
-        if (classId != settingDataId) {
+        if (classId != CMPIDHCPSettingData::servedClass.id) {
             status.rc = CMPI_RC_ERR_NOT_SUPPORTED;
             return;
         }
@@ -169,9 +169,9 @@ CMPIStatus DHCPClient_ExecQuery(CMPIInstanceMI* /*mi*/, const CMPIContext* /*ctx
     return refuse(ZR_HERE);
 }
 
-/// How each association class answers the four association requests. The walks go
+/// How each association class is served in the four association requests. The walks go
 /// on until the adapter ends; an exception leaves them.
-struct AssociationClass {
+struct ServedAssociation {
     unsigned short id;
     void (*associatorNames)(const Request&, const char* resultClass);
     void (*associators)(const Request&, const char* resultClass);
@@ -179,30 +179,30 @@ struct AssociationClass {
     CMPIrc (*references)(const Request&);
 };
 
-using AssociatorColumn = void (*AssociationClass::*)(const Request&, const char* resultClass);
-using ReferenceColumn = CMPIrc (*AssociationClass::*)(const Request&);
+using AssociatorColumn = void (*ServedAssociation::*)(const Request&, const char* resultClass);
+using ReferenceColumn = CMPIrc (*ServedAssociation::*)(const Request&);
 
 template <typename Adapter>
-constexpr AssociationClass association(unsigned short id) {
-    return {id, &deliverAssociatorNames<Adapter>, &deliverAssociators<Adapter>,
+constexpr ServedAssociation association() {
+    return {Adapter::servedClass.id, &deliverAssociatorNames<Adapter>, &deliverAssociators<Adapter>,
             &deliverPaths<Adapter, Ending::returnDone>,
             &deliverInstances<Adapter, Ending::returnDone>};
 }
 
 constexpr std::array associationClasses{
-    association<CMPIDHCPElementCapabilities>(6),
-    association<CMPISAPSAPDependency>(8),
-    association<CMPIDHCPHostedAccessPoint>(34),
-    association<CMPIDHCPRemoteAccessAvailableToElement>(83),
-    association<CMPIDHCPRemoteHostedAccessPoint>(84),
-    association<CMPIDHCPElementSettingData>(86),
-    association<CMPIDHCPOrderedComponent>(87),
+    association<CMPIDHCPElementCapabilities>(),
+    association<CMPISAPSAPDependency>(),
+    association<CMPIDHCPHostedAccessPoint>(),
+    association<CMPIDHCPRemoteAccessAvailableToElement>(),
+    association<CMPIDHCPRemoteHostedAccessPoint>(),
+    association<CMPIDHCPElementSettingData>(),
+    association<CMPIDHCPOrderedComponent>(),
 };
 
-const AssociationClass* findAssociation(unsigned short classId) {
+const ServedAssociation* findAssociation(unsigned short classId) {
     const auto* row =
         std::find_if(associationClasses.begin(), associationClasses.end(),
-                     [classId](const AssociationClass& entry) { return entry.id == classId; });
+                     [classId](const ServedAssociation& entry) { return entry.id == classId; });
     return row == associationClasses.end() ? nullptr : row;
 }
 
@@ -239,7 +239,7 @@ CMPIStatus serveAssociators(const Request& request, const char* assocClass, cons
         }
     });
     for (const unsigned short classId : classIds) {
-        const AssociationClass* association = findAssociation(classId);
+        const ServedAssociation* association = findAssociation(classId);
         served = association != nullptr;
         if (served) {
             guarded([&] { (association->*column)(request, resultClass); });
@@ -269,7 +269,7 @@ CMPIStatus serveReferences(const Request& request, const char* resultClass, Refe
     const unsigned short classId = ProviderUtilities::getClassId(resultClass);
     traceVariable(at, "classId", classId);
     CMPIStatus status{CMPI_RC_OK, nullptr};
-    if (const AssociationClass* association = findAssociation(classId)) {
+    if (const ServedAssociation* association = findAssociation(classId)) {
         try {
             status.rc = (association->*column)(request);
         } catch (const std::exception& exception) {
@@ -298,7 +298,7 @@ CMPIStatus DHCPClient_Associators(CMPIAssociationMI* /*mi*/, const CMPIContext* 
                                   const char* /*role*/, const char* /*resultRole*/,
                                   const char** properties) {
     return serveAssociators({ctx, result, path, properties, ZR_HERE}, assocClass, resultClass,
-                            &AssociationClass::associators, false);
+                            &ServedAssociation::associators, false);
 }
 
 CMPIStatus DHCPClient_AssociatorNames(CMPIAssociationMI* /*mi*/, const CMPIContext* ctx,
@@ -306,7 +306,7 @@ CMPIStatus DHCPClient_AssociatorNames(CMPIAssociationMI* /*mi*/, const CMPIConte
                                       const char* assocClass, const char* resultClass,
                                       const char* /*role*/, const char* /*resultRole*/) {
     return serveAssociators({ctx, result, path, nullptr, ZR_HERE}, assocClass, resultClass,
-                            &AssociationClass::associatorNames, true);
+                            &ServedAssociation::associatorNames, true);
 }
 
 CMPIStatus DHCPClient_References(CMPIAssociationMI* /*mi*/, const CMPIContext* ctx,
@@ -314,30 +314,24 @@ CMPIStatus DHCPClient_References(CMPIAssociationMI* /*mi*/, const CMPIContext* c
                                  const char* resultClass, const char* /*role*/,
                                  const char** properties) {
     return serveReferences({ctx, result, path, properties, ZR_HERE}, resultClass,
-                           &AssociationClass::references, false);
+                           &ServedAssociation::references, false);
 }
 
 CMPIStatus DHCPClient_ReferenceNames(CMPIAssociationMI* /*mi*/, const CMPIContext* ctx,
                                      const CMPIResult* result, const CMPIObjectPath* path,
                                      const char* resultClass, const char* /*role*/) {
     return serveReferences({ctx, result, path, nullptr, ZR_HERE}, resultClass,
-                           &AssociationClass::referenceNames, true);
+                           &ServedAssociation::referenceNames, true);
 }
 
-/// The standard association classes and the served ones under each.
-struct ParentClass {
-    const char* name;
-    std::array<unsigned short, 2> served;  ///< 0: none
+/// The served association classes in the order in which a class name is compared with
+/// their standard ones. Those of one standard class stand together.
+constexpr std::array comparedClasses{
+    Classes::dhcpElementCapabilities,     Classes::hostedDHCPPoint,
+    Classes::dhcpRemoteHostedAccessPoint, Classes::sapSapDependency,
+    Classes::dhcpOrderedComponent,        Classes::dhcpRemoteAccessAvailableToElement,
+    Classes::dhcpElementSettingData,
 };
-
-constexpr std::array<ParentClass, 6> parentClasses{{
-    {"CIM_ElementCapabilities", {6, 0}},
-    {"CIM_HostedAccessPoint", {34, 84}},
-    {"CIM_SAPSAPDependency", {8, 0}},
-    {"CIM_OrderedComponent", {87, 0}},
-    {"CIM_RemoteAccessAvailableToElement", {83, 0}},
-    {"CIM_ElementSettingData", {86, 0}},
-}};
 
 }  // namespace
 
@@ -350,21 +344,22 @@ bool getClassId(const char* className, const char* nameSpace,
         classIds.push_back(classId);
         return true;
     }
-    bool found = false;
+    const std::size_t before = classIds.size();
     const std::string place = nameSpace == nullptr ? "" : nameSpace;
+    std::string_view asked;
+    bool related = false;
     // A name may be related to several: a common ancestor, say.
-    for (const ParentClass& parent : parentClasses) {
-        if (!ProviderUtilities::areClassesRelated(broker, place, className, parent.name)) {
-            continue;
+    for (const Classes::Class& compared : comparedClasses) {
+        if (asked != compared.standardName) {
+            asked = compared.standardName;
+            related = ProviderUtilities::areClassesRelated(broker, place, className,
+                                                           compared.standardName);
         }
-        found = true;
-        for (const unsigned short servedId : parent.served) {
-            if (servedId != 0) {
-                classIds.push_back(servedId);
-            }
+        if (related) {
+            classIds.push_back(compared.id);
         }
     }
-    return found;
+    return classIds.size() != before;
 }
 
 constexpr int cmpiLevel = 200;

@@ -10,7 +10,7 @@
 /// filled with.
 namespace ZR::DHCPClientProvider {
 
-/// What one request hands to the walk that answers it.
+/// What one request hands to the walk that serves it.
 struct Request {
     const CMPIContext* context = nullptr;
     const CMPIResult* result = nullptr;
@@ -20,7 +20,7 @@ struct Request {
 };
 
 /// Whether a walk tells the result that it is complete, or leaves that to the
-/// object manager. Which does which is uneven, and clients of old have got used to it.
+/// object manager. Which does which is uneven, and clients have long relied on it.
 enum class Ending { returnDone, left };
 
 /// Passes one object on. The broker may have refused to make it: a null is told in

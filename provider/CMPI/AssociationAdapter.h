@@ -3,11 +3,13 @@
 #include <cmpift.h>
 
 #include <cstdint>
+#include <functional>
 #include <span>
 #include <string>
 
 #include "CMPI/ElementTables.h"
 #include "include/TracePoint.h"
+#include "providerutilities/Classes.h"
 #include "providerutilities/ProviderUtilities.h"
 #include "zrclient/Moniker.h"
 #include "zrcommon/Strings.h"
@@ -17,59 +19,65 @@ namespace ZR::DHCPClientProvider {
 /// One of the two ends of an association class, in the order of its schema.
 enum class End { first, second };
 
-constexpr End farFrom(End end) {
-    return end == End::first ? End::second : End::first;
-}
-
 /// On what of an association class a source path stands.
 enum class Source { first, second, association, none };
 
+template <typename Row>
+class AssociationAdapter;
+
 /// What an association class says of one of its ends.
-template <typename Record>
+template <typename Row>
 struct AssociationEnd {
-    const char* role = nullptr;
-    unsigned short classId = 0;
-    const char* className = nullptr;
-    const char* standardClass = nullptr;  ///< the standard class of the same stem
-
-    // How the end is located from the other one.
-    std::string_view locatedBy;                      ///< name of the operation in the trace
-    Moniker (Record::*moniker)(Moniker&) = nullptr;  ///< the record's operation
+    const char* role;
+    /// The path of the end by the path of the other one: AssociationAdapter::locate with
+    /// an operation of the record.
+    CMPIObjectPath* (*locate)(AssociationAdapter<Row>& adapter, const CMPIObjectPath* objectPath);
 };
-
-/// All that distinguishes one association class from the others, as a table. Of
-/// static lifetime.
-template <typename Record>
-struct AssociationClass {
-    const char* name;
-    unsigned short id;
-    AssociationEnd<Record> first;
-    AssociationEnd<Record> second;
-    std::span<const ElementProperty<Record>> ownProperties;  ///< beside the references
-
-    template <End end>
-    [[nodiscard]] constexpr const AssociationEnd<Record>& at() const {
-        return end == End::first ? first : second;
-    }
-
-    [[nodiscard]] constexpr Source sourceOf(std::int32_t classId) const {
-        if (classId == first.classId) {
-            return Source::first;
-        }
-        if (classId == second.classId) {
-            return Source::second;
-        }
-        return classId == id ? Source::association : Source::none;
-    }
-};
-
-/// How an end is placed on a path: on all instances of the path's class, or on the
-/// one that the path names.
-enum class Placing { all, single };
 
 /// Where the second of the two reference keys of an association path comes from:
 /// the end's own path, or the one that is located from the first.
 enum class Reference { own, located };
+
+// The usual steps of a walk over an association class, with itself as the source.
+
+/// Places the far end of the walked one on what belongs to its present instance. The
+/// source path is not looked at.
+template <typename Row>
+void placeFromWalked(AssociationAdapter<Row>& adapter, const CMPIObjectPath* objectPath);
+
+/// Whether the walked end stands on an instance.
+template <typename Row>
+bool walkedStands(AssociationAdapter<Row>& adapter);
+
+template <typename Row>
+void stepWalked(AssociationAdapter<Row>& adapter);
+
+/// All that distinguishes one association class from the others, as a table. Of
+/// static lifetime. What has a default is the same for most classes.
+template <typename Row>
+struct AssociationClass {
+    using Adapter = AssociationAdapter<Row>;
+    using First = typename Row::First;
+
+    AssociationEnd<Row> first;
+    AssociationEnd<Row> second;
+    std::span<const ElementProperty<typename Row::Record>> ownProperties = {};
+
+    // The walk when the source is the association class.
+    End walked;
+    void (*place)(Adapter& adapter, const CMPIObjectPath* objectPath) = &placeFromWalked<Row>;
+    bool (*stands)(Adapter& adapter) = &walkedStands<Row>;
+    void (*step)(Adapter& adapter) = &stepWalked<Row>;
+
+    // The reference keys of a path.
+    End referencedFirst = walked;  ///< the key that is set first, from the end's own path
+    Reference other = Reference::located;
+
+    // How the first end is placed when either end is the source: on all instances of the
+    // path's class or on the one that the path names.
+    void (First::*placeFirstAsSource)(const CMPIObjectPath*) = &First::setObjectPath;
+    void (First::*placeFirstLocated)(const CMPIObjectPath*) = &First::setObjectPath;
+};
 
 /// Serves one association class from one source path: finds out on which end the
 /// source stands, places its two end adapters so that walking them yields the far
@@ -78,28 +86,21 @@ enum class Reference { own, located };
 ///
 /// An association adapter is built for one request from the path that the client
 /// names, and walked: operator bool is asked exactly once per step. What it hands
-/// out belongs to the broker, which may also refuse: the answer is then null.
+/// out belongs to the broker, which may also refuse: the result is then null.
 /// Exceptions of its ends and of its record pass. Used by one thread.
 ///
-/// A row has the types First, Second (adapters of the ends) and Record and, as
-/// static members:
+/// A row has the types First, Second (adapters of the ends) and Record and, as static
+/// members:
+///   Classes::Class servedClass
 ///   RowSource trace
-///   AssociationClass<Record> associationClass
-///   End walked            the end that is walked when the source is the association class
-///   End referencedFirst   whose reference key is set first, from its own path
-///   Reference other       where the other reference key comes from
-///   Placing firstAsSource, firstLocated   how the first end is placed
-///
-/// What else is particular to a class, its row has as static functions:
-///   place(adapter, path)        the beginning of a walk over the association class,
-///                               in place of placeFromWalked
-///   stands(adapter)             whether that walk goes on, in place of the walked end
-///   step(adapter)               what follows each step of the walked end
-///   inspect(end, at, moniker)   sees the moniker of an end that was located
+///   AssociationClass<Row> associationClass
 template <typename Row>
 class AssociationAdapter {
   public:
+    using First = typename Row::First;
+    using Second = typename Row::Second;
     using Record = typename Row::Record;
+    static constexpr const Classes::Class& servedClass = Row::servedClass;
 
     AssociationAdapter(const CMPIBroker* mb, const CMPIContext* context,
                        const CMPIObjectPath* objectPath);
@@ -123,41 +124,31 @@ class AssociationAdapter {
     CMPIObjectPath* getObjectPath();
     CMPIInstance* getCMPIInstance(const char** properties);
 
-    /// The path of an end by the path of the other one: through the record, when
-    /// that has keys; else, or when the moniker found cannot be turned into a path,
-    /// one of the end's class without keys, which stands for all its instances.
-    template <End end>
-    CMPIObjectPath* locate(const CMPIObjectPath* objectPath);
+    // For the steps of the rows.
 
-    template <End end>
-    auto& at() {
-        if constexpr (end == End::first) {
-            return first_;
-        } else {
-            return second_;
-        }
-    }
+    First& first() { return first_; }
+    Second& second() { return second_; }
 
-    /// Places the walked end's far one on what belongs to the present instance of
-    /// the walked end. The usual beginning of a walk over the association class.
-    void placeFromWalked();
+    /// The path of an end by the path of the other one: through `find`, an operation of
+    /// the record or what takes one's place, when that path has keys; else, or when the
+    /// moniker found cannot be turned into a path, one of the end's class without keys,
+    /// which stands for all its instances.
+    template <End end, typename Find>
+    CMPIObjectPath* locate(const TracePoint& at, const CMPIObjectPath* objectPath,
+                           const Find& find);
 
   private:
     [[nodiscard]] Source source() const {
-        return Row::associationClass.sourceOf(requestedClassId_);
-    }
-
-    /// Places an end on a path of its class.
-    template <End end, Placing placing = Placing::all>
-    void place(const CMPIObjectPath* objectPath) {
-        if constexpr (placing == Placing::single) {
-            at<end>().setSingleObjectPath(objectPath);
-        } else {
-            at<end>().setObjectPath(objectPath);
+        if (requestedClassId_ == First::servedClass.id) {
+            return Source::first;
         }
+        if (requestedClassId_ == Second::servedClass.id) {
+            return Source::second;
+        }
+        return requestedClassId_ == servedClass.id ? Source::association : Source::none;
     }
 
-    /// What `ask` answers of the end that is far from the source; null without one.
+    /// What `ask` returns for the end that is far from the source; null without one.
     template <typename Ask>
     auto askFarEnd(const Ask& ask) {
         switch (source()) {
@@ -170,12 +161,17 @@ class AssociationAdapter {
         }
     }
 
+    /// The path of an end on which that end stands.
+    CMPIObjectPath* ownPath(End end) const {
+        return end == End::first ? first_.getObjectPath() : second_.getObjectPath();
+    }
+
     const CMPIBroker* _broker;
     const CMPIContext* _context;
     std::string _namespace;
     std::int32_t requestedClassId_;  ///< of the source path
-    typename Row::First first_;
-    typename Row::Second second_;
+    First first_;
+    Second second_;
     Record record_;
 };
 
@@ -192,32 +188,21 @@ AssociationAdapter<Row>::AssociationAdapter(const CMPIBroker* mb, const CMPICont
     const ParameterScope scope(here, " _broker=", _broker, " _context=", _context,
                                " objectPath=", objectPath);
     traceVariable(here, "requestedClassId", static_cast<unsigned>(requestedClassId_));
+    const auto& ours = Row::associationClass;
     switch (source()) {
         case Source::first:
-            place<End::second>(locate<End::second>(objectPath));
-            place<End::first, Row::firstAsSource>(objectPath);
+            second_.setObjectPath(ours.second.locate(*this, objectPath));
+            (first_.*ours.placeFirstAsSource)(objectPath);
             break;
         case Source::second:
-            place<End::first, Row::firstLocated>(locate<End::first>(objectPath));
-            place<End::second>(objectPath);
+            (first_.*ours.placeFirstLocated)(ours.first.locate(*this, objectPath));
+            second_.setObjectPath(objectPath);
             break;
         case Source::association:
-            if constexpr (requires { Row::place(*this, objectPath); }) {
-                Row::place(*this, objectPath);
-            } else {
-                placeFromWalked();
-            }
+            ours.place(*this, objectPath);
             break;
         case Source::none:
             break;
-    }
-}
-
-template <typename Row>
-void AssociationAdapter<Row>::placeFromWalked() {
-    constexpr End far = farFrom(Row::walked);
-    if (at<Row::walked>()) {
-        place<far>(locate<far>(at<Row::walked>().getObjectPath()));
     }
 }
 
@@ -230,11 +215,7 @@ AssociationAdapter<Row>::operator bool() {
         case Source::second:
             return static_cast<bool>(first_);
         case Source::association:
-            if constexpr (requires { Row::stands(*this); }) {
-                return Row::stands(*this);
-            } else {
-                return static_cast<bool>(at<Row::walked>());
-            }
+            return Row::associationClass.stands(*this);
         case Source::none:
             break;
     }
@@ -252,10 +233,7 @@ void AssociationAdapter<Row>::operator++() {
             ++first_;
             break;
         case Source::association:
-            ++at<Row::walked>();
-            if constexpr (requires { Row::step(*this); }) {
-                Row::step(*this);
-            }
+            Row::associationClass.step(*this);
             break;
         case Source::none:
             break;
@@ -269,9 +247,8 @@ bool AssociationAdapter<Row>::isNotTargetClass(const char* resultClass) const {
     if (from != Source::first && from != Source::second) {
         return true;
     }
-    const auto& far =
-        from == Source::first ? Row::associationClass.second : Row::associationClass.first;
-    return !equalNames(resultClass, far.className) && !equalNames(resultClass, far.standardClass);
+    const Classes::Class& far = from == Source::first ? Second::servedClass : First::servedClass;
+    return !equalNames(resultClass, far.name) && !equalNames(resultClass, far.standardName);
 }
 
 template <typename Row>
@@ -290,20 +267,20 @@ template <typename Row>
 CMPIObjectPath* AssociationAdapter<Row>::getObjectPath() {
     const TraceScope scope(Row::trace.at(__func__));
     const auto& ours = Row::associationClass;
-    CMPIObjectPath* path = ProviderUtilities::createObjectPath(_broker, ours.name, _namespace);
+    CMPIObjectPath* path =
+        ProviderUtilities::createObjectPath(_broker, servedClass.name, _namespace);
     if (path == nullptr) {
         return nullptr;
     }
-    constexpr End other = farFrom(Row::referencedFirst);
-    CMPIObjectPath* reference = at<Row::referencedFirst>().getObjectPath();
-    ProviderUtilities::setKeyProperty(path, ours.template at<Row::referencedFirst>().role,
-                                      reference);
-    if constexpr (Row::other == Reference::located) {
-        reference = locate<other>(reference);
-    } else {
-        reference = at<other>().getObjectPath();
-    }
-    ProviderUtilities::setKeyProperty(path, ours.template at<other>().role, reference);
+    const bool startsWithFirst = ours.referencedFirst == End::first;
+    const auto& begin = startsWithFirst ? ours.first : ours.second;
+    const auto& other = startsWithFirst ? ours.second : ours.first;
+    CMPIObjectPath* reference = ownPath(ours.referencedFirst);
+    ProviderUtilities::setKeyProperty(path, begin.role, reference);
+    reference = ours.other == Reference::located
+                    ? other.locate(*this, reference)
+                    : ownPath(startsWithFirst ? End::second : End::first);
+    ProviderUtilities::setKeyProperty(path, other.role, reference);
     return path;
 }
 
@@ -329,23 +306,51 @@ CMPIInstance* AssociationAdapter<Row>::getCMPIInstance(const char** properties) 
 }
 
 template <typename Row>
-template <End end>
-CMPIObjectPath* AssociationAdapter<Row>::locate(const CMPIObjectPath* objectPath) {
-    const auto& ours = Row::associationClass.template at<end>();
-    const TracePoint here = Row::trace.at(ours.locatedBy);
-    const ParameterScope scope(here, " objectPath=", objectPath);
-    CMPIObjectPath* result =
-        ProviderUtilities::createObjectPath(_broker, ours.className, _namespace);
+template <End end, typename Find>
+CMPIObjectPath* AssociationAdapter<Row>::locate(const TracePoint& at,
+                                                const CMPIObjectPath* objectPath,
+                                                const Find& find) {
+    constexpr const Classes::Class& located =
+        end == End::first ? First::servedClass : Second::servedClass;
+    const ParameterScope scope(at, " objectPath=", objectPath);
+    CMPIObjectPath* result = ProviderUtilities::createObjectPath(_broker, located.name, _namespace);
     if (ProviderUtilities::getKeyCount(objectPath) != 0) {
         Moniker moniker;
         ProviderUtilities::transformObjectPathToMoniker(objectPath, moniker);
-        Moniker far = (record_.*ours.moniker)(moniker);
-        if constexpr (requires { Row::inspect(end, here, far); }) {
-            Row::inspect(end, here, far);
-        }
+        Moniker far = std::invoke(find, record_, moniker);
         ProviderUtilities::transformMonikerToObjectPath(far, &result);
     }
     return result;
+}
+
+template <typename Row>
+void placeFromWalked(AssociationAdapter<Row>& adapter, const CMPIObjectPath* /*objectPath*/) {
+    const auto& ours = Row::associationClass;
+    const auto place = [&adapter](auto& walked, auto& far, const auto& farEnd) {
+        if (walked) {
+            far.setObjectPath(farEnd.locate(adapter, walked.getObjectPath()));
+        }
+    };
+    if (ours.walked == End::first) {
+        place(adapter.first(), adapter.second(), ours.second);
+    } else {
+        place(adapter.second(), adapter.first(), ours.first);
+    }
+}
+
+template <typename Row>
+bool walkedStands(AssociationAdapter<Row>& adapter) {
+    return Row::associationClass.walked == End::first ? static_cast<bool>(adapter.first())
+                                                      : static_cast<bool>(adapter.second());
+}
+
+template <typename Row>
+void stepWalked(AssociationAdapter<Row>& adapter) {
+    if (Row::associationClass.walked == End::first) {
+        ++adapter.first();
+    } else {
+        ++adapter.second();
+    }
 }
 
 }  // namespace ZR::DHCPClientProvider

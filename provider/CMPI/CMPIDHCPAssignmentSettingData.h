@@ -7,6 +7,7 @@ namespace ZR::DHCPClientProvider {
 extern const std::string loggerCMPIDHCPAssignmentSettingData;
 
 struct DHCPAssignmentSettingDataRow {
+    static constexpr const Classes::Class& servedClass = Classes::ipAssignmentSettingData;
     static const RowSource trace;
     // The text is the IP endpoint's; clients know it.
     static constexpr const char* refusal = noIPProtocolEndpoint;

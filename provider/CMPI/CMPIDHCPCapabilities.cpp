@@ -34,8 +34,8 @@ constexpr std::array<ElementProperty<Element>, 8> instanceProperties{{
 const RowSource DHCPCapabilitiesRow::trace{
     {"CMPI/CMPIDHCPCapabilities", loggerCMPIDHCPCapabilities}, "~CMPIDHCPCapabilities", __LINE__};
 
-const ElementClass<Element> DHCPCapabilitiesRow::elementClass{"QVXZR_DHCPCapabilities", filterKeys,
-                                                              pathKeys, instanceProperties};
+const ElementClass<Element> DHCPCapabilitiesRow::elementClass{filterKeys, pathKeys,
+                                                              instanceProperties};
 
 template class ElementAdapter<DHCPCapabilitiesRow>;
 

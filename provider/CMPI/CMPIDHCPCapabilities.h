@@ -9,6 +9,7 @@ extern const std::string loggerCMPIDHCPCapabilities;
 
 struct DHCPCapabilitiesRow {
     using Element = DHCPCapabilities;
+    static constexpr const Classes::Class& servedClass = Classes::dhcpCapabilities;
     static const RowSource trace;
     static const ElementClass<Element> elementClass;
 };

@@ -7,6 +7,7 @@ namespace ZR::DHCPClientProvider {
 extern const std::string loggerCMPIDHCPComputerSystem;
 
 struct DHCPComputerSystemRow {
+    static constexpr const Classes::Class& servedClass = Classes::computerSystem;
     static const RowSource trace;
     static constexpr const char* refusal = noComputerSystem;
     static constexpr bool asksBeforeFirst = true;

@@ -8,11 +8,24 @@ const std::string loggerCMPIDHCPElementCapabilities = loggerCategory;
 
 namespace {
 
-using Record = DHCPElementCapabilitiesAssociation::Record;
+using Row = DHCPElementCapabilitiesAssociation;
+using Record = Row::Record;
 
 constexpr std::array ownProperties{
     property<&Record::getCharacteristics>("Characteristics"),
 };
+
+CMPIObjectPath* locateDHCPProtocolEndpoint(CMPIDHCPElementCapabilities& adapter,
+                                           const CMPIObjectPath* objectPath) {
+    return adapter.locate<End::first>(Row::trace.at(__func__), objectPath,
+                                      &Record::getDHCPEndpointMoniker);
+}
+
+CMPIObjectPath* locateCapabilities(CMPIDHCPElementCapabilities& adapter,
+                                   const CMPIObjectPath* objectPath) {
+    return adapter.locate<End::second>(Row::trace.at(__func__), objectPath,
+                                       &Record::getDHCPCapabilitiesMoniker);
+}
 
 }  // namespace
 
@@ -21,15 +34,12 @@ const RowSource DHCPElementCapabilitiesAssociation::trace{
     "~CMPIDHCPElementCapabilities",
     __LINE__};
 
-const AssociationClass<DHCPElementCapabilitiesAssociation::Record>
+constinit const AssociationClass<DHCPElementCapabilitiesAssociation>
     DHCPElementCapabilitiesAssociation::associationClass{
-        "QVXZR_DHCPElementCapabilities",
-        6,
-        {"ManagedElement", 4, "QVXZR_DHCPProtocolEndpoint", "CIM_DHCPProtocolEndpoint",
-         "locateDHCPProtocolEndpoint", &Record::getDHCPEndpointMoniker},
-        {"Capabilities", 5, "QVXZR_DHCPCapabilities", "CIM_DHCPCapabilities", "locateCapabilities",
-         &Record::getDHCPCapabilitiesMoniker},
-        ownProperties,
+        .first = {"ManagedElement", &locateDHCPProtocolEndpoint},
+        .second = {"Capabilities", &locateCapabilities},
+        .ownProperties = ownProperties,
+        .walked = End::first,
     };
 
 template class AssociationAdapter<DHCPElementCapabilitiesAssociation>;

@@ -14,13 +14,9 @@ struct DHCPElementCapabilitiesAssociation {
     using Second = CMPIDHCPCapabilities;
     using Record = ElementCapabilities;
 
+    static constexpr const Classes::Class& servedClass = Classes::dhcpElementCapabilities;
     static const RowSource trace;
-    static const AssociationClass<Record> associationClass;
-    static constexpr End walked = End::first;
-    static constexpr End referencedFirst = End::first;
-    static constexpr Reference other = Reference::located;
-    static constexpr Placing firstAsSource = Placing::all;
-    static constexpr Placing firstLocated = Placing::all;
+    static const AssociationClass<DHCPElementCapabilitiesAssociation> associationClass;
 };
 
 extern template class AssociationAdapter<DHCPElementCapabilitiesAssociation>;

@@ -8,11 +8,24 @@ const std::string loggerCMPIDHCPElementSettingData = loggerCategory;
 
 namespace {
 
-using Record = DHCPElementSettingDataAssociation::Record;
+using Row = DHCPElementSettingDataAssociation;
+using Record = Row::Record;
 
 constexpr std::array ownProperties{
     property<&Record::getIsCurrent>("IsCurrent"),
 };
+
+CMPIObjectPath* locateDHCPEndptPath(CMPIDHCPElementSettingData& adapter,
+                                    const CMPIObjectPath* objectPath) {
+    return adapter.locate<End::first>(Row::trace.at(__func__), objectPath,
+                                      &Record::getManagedElementMoniker);
+}
+
+CMPIObjectPath* locateDHCPSettingDataPath(CMPIDHCPElementSettingData& adapter,
+                                          const CMPIObjectPath* objectPath) {
+    return adapter.locate<End::second>(Row::trace.at(__func__), objectPath,
+                                       &Record::getDHCPSettingDataMoniker);
+}
 
 }  // namespace
 
@@ -21,15 +34,12 @@ const RowSource DHCPElementSettingDataAssociation::trace{
     "~CMPIDHCPElementSettingData",
     __LINE__};
 
-const AssociationClass<DHCPElementSettingDataAssociation::Record>
+constinit const AssociationClass<DHCPElementSettingDataAssociation>
     DHCPElementSettingDataAssociation::associationClass{
-        "QVXZR_DHCPElementSettingData",
-        86,
-        {"ManagedElement", 4, "QVXZR_DHCPProtocolEndpoint", "CIM_DHCPProtocolEndpoint",
-         "locateDHCPEndptPath", &Record::getManagedElementMoniker},
-        {"SettingData", 85, "QVXZR_DHCPSettingData", "CIM_DHCPSettingData",
-         "locateDHCPSettingDataPath", &Record::getDHCPSettingDataMoniker},
-        ownProperties,
+        .first = {"ManagedElement", &locateDHCPEndptPath},
+        .second = {"SettingData", &locateDHCPSettingDataPath},
+        .ownProperties = ownProperties,
+        .walked = End::second,
     };
 
 template class AssociationAdapter<DHCPElementSettingDataAssociation>;

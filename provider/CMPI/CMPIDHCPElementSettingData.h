@@ -14,13 +14,9 @@ struct DHCPElementSettingDataAssociation {
     using Second = CMPIDHCPSettingData;
     using Record = DHCPElementSettingData;
 
+    static constexpr const Classes::Class& servedClass = Classes::dhcpElementSettingData;
     static const RowSource trace;
-    static const AssociationClass<Record> associationClass;
-    static constexpr End walked = End::second;
-    static constexpr End referencedFirst = End::second;
-    static constexpr Reference other = Reference::located;
-    static constexpr Placing firstAsSource = Placing::all;
-    static constexpr Placing firstLocated = Placing::all;
+    static const AssociationClass<DHCPElementSettingDataAssociation> associationClass;
 };
 
 extern template class AssociationAdapter<DHCPElementSettingDataAssociation>;

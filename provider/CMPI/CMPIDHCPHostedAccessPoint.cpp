@@ -4,38 +4,59 @@ namespace ZR::DHCPClientProvider {
 
 const std::string loggerCMPIDHCPHostedAccessPoint = loggerCategory;
 
-const RowSource DHCPHostedAccessPointAssociation::trace{
-    {"CMPI/CMPIDHCPHostedAccessPoint", loggerCMPIDHCPHostedAccessPoint},
-    "~CMPIDHCPHostedAccessPoint",
-    __LINE__};
+namespace {
 
-const AssociationClass<DHCPHostedAccessPointAssociation::Record>
-    DHCPHostedAccessPointAssociation::associationClass{
-        "QVXZR_HostedDHCPPoint",
-        34,
-        {"Antecedent", 1, "QVXZR_ComputerSystem", "CIM_ComputerSystem", "locateComputer",
-         &Record::getSystemMoniker},
-        {"Dependent", 4, "QVXZR_DHCPProtocolEndpoint", "CIM_DHCPProtocolEndpoint",
-         "locateDHCPProtocolEndpoint", &Record::getDHCPProtocolEndPointMoniker},
-        {},
-    };
+using Row = DHCPHostedAccessPointAssociation;
+using Record = Row::Record;
 
-bool DHCPHostedAccessPointAssociation::stands(Adapter& adapter) {
-    return static_cast<bool>(adapter.at<End::first>()) ||
-           static_cast<bool>(adapter.at<End::second>());
+CMPIObjectPath* locateComputer(CMPIDHCPHostedAccessPoint& adapter,
+                               const CMPIObjectPath* objectPath) {
+    return adapter.locate<End::first>(Row::trace.at(__func__), objectPath,
+                                      &Record::getSystemMoniker);
 }
 
-void DHCPHostedAccessPointAssociation::step(Adapter& adapter) {
-    auto& computer = adapter.at<End::first>();
-    auto& endpoint = adapter.at<End::second>();
+CMPIObjectPath* locateDHCPProtocolEndpoint(CMPIDHCPHostedAccessPoint& adapter,
+                                           const CMPIObjectPath* objectPath) {
+    return adapter.locate<End::second>(Row::trace.at(__func__), objectPath,
+                                       &Record::getDHCPProtocolEndPointMoniker);
+}
+
+// The pairs run over the endpoints of one computer after the other.
+
+bool eitherStands(CMPIDHCPHostedAccessPoint& adapter) {
+    return static_cast<bool>(adapter.first()) || static_cast<bool>(adapter.second());
+}
+
+void stepToNextPair(CMPIDHCPHostedAccessPoint& adapter) {
+    auto& computer = adapter.first();
+    auto& endpoint = adapter.second();
+    ++endpoint;
     if (endpoint) {
         return;
     }
     ++computer;
     if (computer) {
-        endpoint.setObjectPath(adapter.locate<End::second>(computer.getObjectPath()));
+        endpoint.setObjectPath(locateDHCPProtocolEndpoint(adapter, computer.getObjectPath()));
     }
 }
+
+}  // namespace
+
+const RowSource DHCPHostedAccessPointAssociation::trace{
+    {"CMPI/CMPIDHCPHostedAccessPoint", loggerCMPIDHCPHostedAccessPoint},
+    "~CMPIDHCPHostedAccessPoint",
+    __LINE__};
+
+constinit const AssociationClass<DHCPHostedAccessPointAssociation>
+    DHCPHostedAccessPointAssociation::associationClass{
+        .first = {"Antecedent", &locateComputer},
+        .second = {"Dependent", &locateDHCPProtocolEndpoint},
+        .walked = End::second,
+        .stands = &eitherStands,
+        .step = &stepToNextPair,
+        .referencedFirst = End::first,
+        .other = Reference::own,
+    };
 
 template class AssociationAdapter<DHCPHostedAccessPointAssociation>;
 

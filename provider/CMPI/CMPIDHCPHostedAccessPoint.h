@@ -13,19 +13,10 @@ struct DHCPHostedAccessPointAssociation {
     using First = CMPIDHCPComputerSystem;
     using Second = CMPIDHCPProtocolEndpoint;
     using Record = DHCPHostedAccessPoint;
-    using Adapter = AssociationAdapter<DHCPHostedAccessPointAssociation>;
 
+    static constexpr const Classes::Class& servedClass = Classes::hostedDHCPPoint;
     static const RowSource trace;
-    static const AssociationClass<Record> associationClass;
-    static constexpr End walked = End::second;
-    static constexpr End referencedFirst = End::first;
-    static constexpr Reference other = Reference::own;
-    static constexpr Placing firstAsSource = Placing::all;
-    static constexpr Placing firstLocated = Placing::all;
-
-    // The pairs run over the endpoints of one computer after the other.
-    static bool stands(Adapter& adapter);
-    static void step(Adapter& adapter);
+    static const AssociationClass<DHCPHostedAccessPointAssociation> associationClass;
 };
 
 extern template class AssociationAdapter<DHCPHostedAccessPointAssociation>;

@@ -8,11 +8,52 @@ const std::string loggerCMPIDHCPOrderedComponent = loggerCategory;
 
 namespace {
 
-using Record = DHCPOrderedComponentAssociation::Record;
+using Row = DHCPOrderedComponentAssociation;
+using Record = Row::Record;
 
 constexpr std::array ownProperties{
     property<&Record::getAssignedSequence>("AssignedSequence"),
 };
+
+constexpr const char* groupRole = "GroupComponent";
+constexpr const char* partRole = "PartComponent";
+
+CMPIObjectPath* locateAssignmentSetting(CMPIDHCPOrderedComponent& adapter,
+                                        const CMPIObjectPath* objectPath) {
+    return adapter.locate<End::first>(Row::trace.at(__func__), objectPath,
+                                      &Record::getGroupComponentMoniker);
+}
+
+CMPIObjectPath* locateDhcpAssignmentSetting(CMPIDHCPOrderedComponent& adapter,
+                                            const CMPIObjectPath* objectPath) {
+    return adapter.locate<End::second>(Row::trace.at(__func__), objectPath,
+                                       &Record::getPartComponentMoniker);
+}
+
+/// Narrows the ends to the references of an association path, as far as it has
+/// them. False, with nothing done, when the path has no keys at all.
+bool setObjectPath(CMPIDHCPOrderedComponent& adapter, const CMPIObjectPath* objectPath) {
+    const ParameterScope scope(Row::trace.at(__func__), " objectPath=", objectPath);
+    if (ProviderUtilities::getKeyCount(objectPath) == 0) {
+        return false;
+    }
+    CMPIObjectPath* reference = nullptr;
+    if (ProviderUtilities::getKeyProperty(objectPath, partRole, &reference)) {
+        adapter.second().setObjectPath(reference);
+    }
+    if (ProviderUtilities::getKeyProperty(objectPath, groupRole, &reference)) {
+        adapter.first().setObjectPath(reference);
+    }
+    return true;
+}
+
+void placeByReferences(CMPIDHCPOrderedComponent& adapter, const CMPIObjectPath* objectPath) {
+    if (!setObjectPath(adapter, objectPath)) {
+        const CMPIObjectPath* setting = locateDhcpAssignmentSetting(adapter, objectPath);
+        adapter.second().setObjectPath(setting);
+        adapter.first().setObjectPath(locateAssignmentSetting(adapter, setting));
+    }
+}
 
 }  // namespace
 
@@ -21,40 +62,16 @@ const RowSource DHCPOrderedComponentAssociation::trace{
     "~CMPIDHCPOrderedComponent",
     __LINE__};
 
-const AssociationClass<DHCPOrderedComponentAssociation::Record>
+constinit const AssociationClass<DHCPOrderedComponentAssociation>
     DHCPOrderedComponentAssociation::associationClass{
-        "QVXZR_DHCPOrderedComponent",
-        87,
-        {"GroupComponent", 66, "QVXZR_IPAssignmentSettingData", "CIM_IPAssignmentSettingData",
-         "locateAssignmentSetting", &Record::getGroupComponentMoniker},
-        {"PartComponent", 85, "QVXZR_DHCPSettingData", "CIM_DHCPSettingData",
-         "locateDhcpAssignmentSetting", &Record::getPartComponentMoniker},
-        ownProperties,
+        .first = {groupRole, &locateAssignmentSetting},
+        .second = {partRole, &locateDhcpAssignmentSetting},
+        .ownProperties = ownProperties,
+        .walked = End::second,
+        .place = &placeByReferences,
+        .placeFirstAsSource = &CMPIDHCPAssignmentSettingData::setSingleObjectPath,
+        .placeFirstLocated = &CMPIDHCPAssignmentSettingData::setSingleObjectPath,
     };
-
-void DHCPOrderedComponentAssociation::place(Adapter& adapter, const CMPIObjectPath* objectPath) {
-    if (!setObjectPath(adapter, objectPath)) {
-        const CMPIObjectPath* setting = adapter.locate<End::second>(objectPath);
-        adapter.at<End::second>().setObjectPath(setting);
-        adapter.at<End::first>().setObjectPath(adapter.locate<End::first>(setting));
-    }
-}
-
-bool DHCPOrderedComponentAssociation::setObjectPath(Adapter& adapter,
-                                                    const CMPIObjectPath* objectPath) {
-    const ParameterScope scope(trace.at(__func__), " objectPath=", objectPath);
-    if (ProviderUtilities::getKeyCount(objectPath) == 0) {
-        return false;
-    }
-    CMPIObjectPath* reference = nullptr;
-    if (ProviderUtilities::getKeyProperty(objectPath, associationClass.second.role, &reference)) {
-        adapter.at<End::second>().setObjectPath(reference);
-    }
-    if (ProviderUtilities::getKeyProperty(objectPath, associationClass.first.role, &reference)) {
-        adapter.at<End::first>().setObjectPath(reference);
-    }
-    return true;
-}
 
 template class AssociationAdapter<DHCPOrderedComponentAssociation>;
 

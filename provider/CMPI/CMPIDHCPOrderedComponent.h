@@ -13,20 +13,10 @@ struct DHCPOrderedComponentAssociation {
     using First = CMPIDHCPAssignmentSettingData;
     using Second = CMPIDHCPSettingData;
     using Record = DHCPOrderedComponent;
-    using Adapter = AssociationAdapter<DHCPOrderedComponentAssociation>;
 
+    static constexpr const Classes::Class& servedClass = Classes::dhcpOrderedComponent;
     static const RowSource trace;
-    static const AssociationClass<Record> associationClass;
-    static constexpr End walked = End::second;
-    static constexpr End referencedFirst = End::second;
-    static constexpr Reference other = Reference::located;
-    static constexpr Placing firstAsSource = Placing::single;
-    static constexpr Placing firstLocated = Placing::single;
-
-    static void place(Adapter& adapter, const CMPIObjectPath* objectPath);
-    /// Narrows the ends to the references of an association path, as far as it has
-    /// them. False, with nothing done, when the path has no keys at all.
-    static bool setObjectPath(Adapter& adapter, const CMPIObjectPath* objectPath);
+    static const AssociationClass<DHCPOrderedComponentAssociation> associationClass;
 };
 
 extern template class AssociationAdapter<DHCPOrderedComponentAssociation>;

@@ -65,8 +65,8 @@ const RowSource DHCPProtocolEndpointRow::trace{
     "~CMPIDHCPProtocolEndpoint",
     __LINE__};
 
-const ElementClass<Element> DHCPProtocolEndpointRow::elementClass{
-    "QVXZR_DHCPProtocolEndpoint", filterKeys, pathKeys, instanceProperties};
+const ElementClass<Element> DHCPProtocolEndpointRow::elementClass{filterKeys, pathKeys,
+                                                                  instanceProperties};
 
 template class ElementAdapter<DHCPProtocolEndpointRow>;
 

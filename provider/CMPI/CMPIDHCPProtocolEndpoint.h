@@ -9,6 +9,7 @@ extern const std::string loggerCMPIDHCPProtocolEndpoint;
 
 struct DHCPProtocolEndpointRow {
     using Element = DHCPProtocolEndpoint;
+    static constexpr const Classes::Class& servedClass = Classes::dhcpProtocolEndpoint;
     static const RowSource trace;
     static const ElementClass<Element> elementClass;
 };

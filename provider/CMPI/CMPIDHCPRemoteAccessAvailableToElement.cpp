@@ -8,11 +8,24 @@ const std::string loggerCMPIDHCPRemoteAccessAvailableToElement = loggerCategory;
 
 namespace {
 
-using Record = DHCPRemoteAccessAvailableToElementAssociation::Record;
+using Row = DHCPRemoteAccessAvailableToElementAssociation;
+using Record = Row::Record;
 
 constexpr std::array ownProperties{
     property<&Record::getOrderOfAccess>("OrderOfAccess"),
 };
+
+CMPIObjectPath* locateRemoteSAP(CMPIDHCPRemoteAccessAvailableToElement& adapter,
+                                const CMPIObjectPath* objectPath) {
+    return adapter.locate<End::first>(Row::trace.at(__func__), objectPath,
+                                      &Record::getRemoteServiceAccessPointMoniker);
+}
+
+CMPIObjectPath* locateDHCPEndptPath(CMPIDHCPRemoteAccessAvailableToElement& adapter,
+                                    const CMPIObjectPath* objectPath) {
+    return adapter.locate<End::second>(Row::trace.at(__func__), objectPath,
+                                       &Record::getDHCPProtocolEndpointMoniker);
+}
 
 }  // namespace
 
@@ -21,15 +34,12 @@ const RowSource DHCPRemoteAccessAvailableToElementAssociation::trace{
     "~CMPIDHCPRemoteAccessAvailableToElement",
     __LINE__};
 
-const AssociationClass<DHCPRemoteAccessAvailableToElementAssociation::Record>
+constinit const AssociationClass<DHCPRemoteAccessAvailableToElementAssociation>
     DHCPRemoteAccessAvailableToElementAssociation::associationClass{
-        "QVXZR_DHCPRemoteAccessAvailableToElement",
-        83,
-        {"Antecedent", 82, "QVXZR_DHCPRemoteServiceAccessPoint", "CIM_RemoteServiceAccessPoint",
-         "locateRemoteSAP", &Record::getRemoteServiceAccessPointMoniker},
-        {"Dependent", 4, "QVXZR_DHCPProtocolEndpoint", "CIM_DHCPProtocolEndpoint",
-         "locateDHCPEndptPath", &Record::getDHCPProtocolEndpointMoniker},
-        ownProperties,
+        .first = {"Antecedent", &locateRemoteSAP},
+        .second = {"Dependent", &locateDHCPEndptPath},
+        .ownProperties = ownProperties,
+        .walked = End::first,
     };
 
 template class AssociationAdapter<DHCPRemoteAccessAvailableToElementAssociation>;

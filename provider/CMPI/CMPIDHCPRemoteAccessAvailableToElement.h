@@ -14,13 +14,10 @@ struct DHCPRemoteAccessAvailableToElementAssociation {
     using Second = CMPIDHCPProtocolEndpoint;
     using Record = DHCPRemoteAccessAvailableToElement;
 
+    static constexpr const Classes::Class& servedClass =
+        Classes::dhcpRemoteAccessAvailableToElement;
     static const RowSource trace;
-    static const AssociationClass<Record> associationClass;
-    static constexpr End walked = End::first;
-    static constexpr End referencedFirst = End::first;
-    static constexpr Reference other = Reference::located;
-    static constexpr Placing firstAsSource = Placing::all;
-    static constexpr Placing firstLocated = Placing::all;
+    static const AssociationClass<DHCPRemoteAccessAvailableToElementAssociation> associationClass;
 };
 
 extern template class AssociationAdapter<DHCPRemoteAccessAvailableToElementAssociation>;

@@ -13,17 +13,10 @@ struct DHCPRemoteHostedAccessPointAssociation {
     using First = CMPIDHCPComputerSystem;
     using Second = CMPIDHCPRemoteServiceAccessPoint;
     using Record = DHCPRemoteHostedAccessPoint;
-    using Adapter = AssociationAdapter<DHCPRemoteHostedAccessPointAssociation>;
 
+    static constexpr const Classes::Class& servedClass = Classes::dhcpRemoteHostedAccessPoint;
     static const RowSource trace;
-    static const AssociationClass<Record> associationClass;
-    static constexpr End walked = End::second;
-    static constexpr End referencedFirst = End::second;
-    static constexpr Reference other = Reference::own;
-    static constexpr Placing firstAsSource = Placing::all;
-    static constexpr Placing firstLocated = Placing::all;
-
-    static bool stands(Adapter& adapter);
+    static const AssociationClass<DHCPRemoteHostedAccessPointAssociation> associationClass;
 };
 
 extern template class AssociationAdapter<DHCPRemoteHostedAccessPointAssociation>;

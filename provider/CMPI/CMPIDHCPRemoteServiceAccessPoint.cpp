@@ -41,8 +41,8 @@ const RowSource DHCPRemoteServiceAccessPointRow::trace{
     "~CMPIDHCPRemoteServiceAccessPoint",
     __LINE__};
 
-const ElementClass<Element> DHCPRemoteServiceAccessPointRow::elementClass{
-    "QVXZR_DHCPRemoteServiceAccessPoint", filterKeys, pathKeys, instanceProperties};
+const ElementClass<Element> DHCPRemoteServiceAccessPointRow::elementClass{filterKeys, pathKeys,
+                                                                          instanceProperties};
 
 template class ElementAdapter<DHCPRemoteServiceAccessPointRow>;
 

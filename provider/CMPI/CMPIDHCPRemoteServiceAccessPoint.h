@@ -9,6 +9,7 @@ extern const std::string loggerCMPIDHCPRemoteServiceAccessPoint;
 
 struct DHCPRemoteServiceAccessPointRow {
     using Element = DHCPRemoteServiceAccessPoint;
+    static constexpr const Classes::Class& servedClass = Classes::dhcpRemoteServiceAccessPoint;
     static const RowSource trace;
     static const ElementClass<Element> elementClass;
 };

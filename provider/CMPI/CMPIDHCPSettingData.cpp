@@ -36,14 +36,14 @@ constexpr std::array<ElementProperty<Element>, 9> instanceProperties{{
 const RowSource DHCPSettingDataRow::trace{
     {"CMPI/CMPIDHCPSettingData", loggerCMPIDHCPSettingData}, "~CMPIDHCPSettingData", __LINE__};
 
-const ElementClass<Element> DHCPSettingDataRow::elementClass{"QVXZR_DHCPSettingData", filterKeys,
-                                                             pathKeys, instanceProperties};
+const ElementClass<Element> DHCPSettingDataRow::elementClass{filterKeys, pathKeys,
+                                                             instanceProperties};
 
 CMPIStatus DHCPSettingDataRow::modify(const Element& element, const CMPIInstance* newInstance) {
     if (newInstance == nullptr) {
         return {CMPI_RC_ERR_FAILED, nullptr};
     }
-    // Absent, null or no text: the name is empty, and is written as such.
+    // Absent, null or not a text: the name is empty, and is written as such.
     std::string name;
     ProviderUtilities::getProperty(newInstance, "ConfigurationName", name, false);
     return {element.setConfigurationName(name) ? CMPI_RC_OK : CMPI_RC_ERR_FAILED, nullptr};

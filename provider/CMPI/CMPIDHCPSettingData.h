@@ -9,6 +9,7 @@ extern const std::string loggerCMPIDHCPSettingData;
 
 struct DHCPSettingDataRow {
     using Element = DHCPSettingData;
+    static constexpr const Classes::Class& servedClass = Classes::dhcpSettingData;
     static const RowSource trace;
     static const ElementClass<Element> elementClass;
 

@@ -7,6 +7,7 @@ namespace ZR::DHCPClientProvider {
 extern const std::string loggerCMPIIPProtocolEndpoint;
 
 struct IPProtocolEndpointRow {
+    static constexpr const Classes::Class& servedClass = Classes::ipProtocolEndpoint;
     static const RowSource trace;
     static constexpr const char* refusal = noIPProtocolEndpoint;
     static constexpr bool asksBeforeFirst = true;

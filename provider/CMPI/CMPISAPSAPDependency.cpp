@@ -4,35 +4,48 @@ namespace ZR::DHCPClientProvider {
 
 const std::string loggerCMPISAPSAPDependency = loggerCategory;
 
+namespace {
+
+using Row = SAPSAPDependencyAssociation;
+using Record = Row::Record;
+
+CMPIObjectPath* locateIPEndpoint(CMPISAPSAPDependency& adapter, const CMPIObjectPath* objectPath) {
+    return adapter.locate<End::first>(Row::trace.at(__func__), objectPath,
+                                      &Record::getIPSAPMoniker);
+}
+
+CMPIObjectPath* locateDHCPEndpoint(CMPISAPSAPDependency& adapter,
+                                   const CMPIObjectPath* objectPath) {
+    const TracePoint at = Row::trace.at(__func__);
+    return adapter.locate<End::second>(at, objectPath, [&at](Record& record, Moniker& known) {
+        Moniker found = record.getDHCPSAPMoniker(known);
+        traceVariable(at, "KEY Count", static_cast<unsigned>(found.getKeyCount()));
+        return found;
+    });
+}
+
+void placeFromSource(CMPISAPSAPDependency& adapter, const CMPIObjectPath* objectPath) {
+    if (adapter.second()) {
+        // The endpoint's path is fetched but not used: the IP endpoint is located
+        // from the source path itself.
+        static_cast<void>(adapter.second().getObjectPath());
+        adapter.first().setObjectPath(locateIPEndpoint(adapter, objectPath));
+    }
+}
+
+}  // namespace
+
 const RowSource SAPSAPDependencyAssociation::trace{
     {"CMPI/CMPISAPSAPDependency", loggerCMPISAPSAPDependency}, "~CMPISAPSAPDependency", __LINE__};
 
-const AssociationClass<SAPSAPDependencyAssociation::Record>
+constinit const AssociationClass<SAPSAPDependencyAssociation>
     SAPSAPDependencyAssociation::associationClass{
-        "QVXZR_SAPSAPDependency",
-        8,
-        {"Antecedent", 9, "QVXZR_IPProtocolEndpoint", "CIM_IPProtocolEndpoint", "locateIPEndpoint",
-         &Record::getIPSAPMoniker},
-        {"Dependent", 4, "QVXZR_DHCPProtocolEndpoint", "CIM_DHCPProtocolEndpoint",
-         "locateDHCPEndpoint", &Record::getDHCPSAPMoniker},
-        {},
+        .first = {"Antecedent", &locateIPEndpoint},
+        .second = {"Dependent", &locateDHCPEndpoint},
+        .walked = End::second,
+        .place = &placeFromSource,
+        .placeFirstLocated = &CMPIIPProtocolEndpoint::setSingleObjectPath,
     };
-
-void SAPSAPDependencyAssociation::place(Adapter& adapter, const CMPIObjectPath* objectPath) {
-    auto& dhcpEndpoint = adapter.at<End::second>();
-    if (dhcpEndpoint) {
-        // The endpoint's path is fetched but not used: the IP endpoint is located
-        // from the source path itself.
-        static_cast<void>(dhcpEndpoint.getObjectPath());
-        adapter.at<End::first>().setObjectPath(adapter.locate<End::first>(objectPath));
-    }
-}
-
-void SAPSAPDependencyAssociation::inspect(End located, const TracePoint& at, const Moniker& found) {
-    if (located == End::second) {
-        traceVariable(at, "KEY Count", static_cast<unsigned>(found.getKeyCount()));
-    }
-}
 
 template class AssociationAdapter<SAPSAPDependencyAssociation>;
 

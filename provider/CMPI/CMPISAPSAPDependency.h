@@ -13,18 +13,10 @@ struct SAPSAPDependencyAssociation {
     using First = CMPIIPProtocolEndpoint;
     using Second = CMPIDHCPProtocolEndpoint;
     using Record = SAPSAPDependency;
-    using Adapter = AssociationAdapter<SAPSAPDependencyAssociation>;
 
+    static constexpr const Classes::Class& servedClass = Classes::sapSapDependency;
     static const RowSource trace;
-    static const AssociationClass<Record> associationClass;
-    static constexpr End walked = End::second;
-    static constexpr End referencedFirst = End::second;
-    static constexpr Reference other = Reference::located;
-    static constexpr Placing firstAsSource = Placing::all;
-    static constexpr Placing firstLocated = Placing::single;
-
-    static void place(Adapter& adapter, const CMPIObjectPath* objectPath);
-    static void inspect(End located, const TracePoint& at, const Moniker& found);
+    static const AssociationClass<SAPSAPDependencyAssociation> associationClass;
 };
 
 extern template class AssociationAdapter<SAPSAPDependencyAssociation>;

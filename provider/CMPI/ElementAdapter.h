@@ -7,6 +7,7 @@
 
 #include "CMPI/ElementTables.h"
 #include "include/TracePoint.h"
+#include "providerutilities/Classes.h"
 #include "providerutilities/ProviderUtilities.h"
 
 namespace ZR::DHCPClientProvider {
@@ -15,15 +16,17 @@ namespace ZR::DHCPClientProvider {
 ///
 /// An element adapter is built for one request and walked: while it is true, ask
 /// it for an object path or an instance, and step on. What it hands out belongs to
-/// the broker, which may also refuse: the answer is then null. It borrows broker
+/// the broker, which may also refuse: the result is then null. It borrows broker
 /// and context, and lets the exceptions of its element pass. Used by one thread.
 ///
-/// A row has the type Element and, as static members, RowSource trace and
-/// ElementClass<Element> elementClass. One whose instances can be changed has
-/// modify(element, newInstance) besides, which answers a CMPIStatus.
+/// A row has the type Element and, as static members, Classes::Class servedClass,
+/// RowSource trace and ElementClass<Element> elementClass. One whose instances can be changed has
+/// modify(element, newInstance) besides, which returns a CMPIStatus.
 template <typename Row>
 class ElementAdapter {
   public:
+    static constexpr const Classes::Class& servedClass = Row::servedClass;
+
     /// Stands on the first of all instances in a namespace.
     ElementAdapter(const CMPIBroker* mb, const CMPIContext* context, std::string nameSpace)
         : _broker(mb), _context(context), _namespace(std::move(nameSpace)) {
@@ -64,7 +67,7 @@ class ElementAdapter {
     [[nodiscard]] CMPIObjectPath* getObjectPath() const {
         const TracePoint at = Row::trace.at(__func__);
         const TraceScope scope(at);
-        return makeObjectPath(_broker, Row::elementClass.name, _namespace, element_,
+        return makeObjectPath(_broker, Row::servedClass.name, _namespace, element_,
                               Row::elementClass.pathKeys, at);
     }
 

@@ -22,7 +22,7 @@ struct FilterKey {
     bool traced;
 };
 
-/// A key of the object path; `get` answers false when the element has no value for it.
+/// A key of the object path; `get` returns false when the element has no value for it.
 template <typename Element>
 struct PathKey {
     const char* name;
@@ -30,7 +30,7 @@ struct PathKey {
     const char* tracedAs;  ///< null: not traced
 };
 
-/// A property of the instance; `set` asks the element and sets what it answers.
+/// A property of the instance; `set` asks the element and sets the value that it gets.
 template <typename Element>
 struct ElementProperty {
     const char* name;
@@ -41,7 +41,6 @@ struct ElementProperty {
 /// All that distinguishes one element class from the others. Of static lifetime.
 template <typename Element>
 struct ElementClass {
-    const char* name;
     std::span<const FilterKey<Element>> filterKeys;
     std::span<const PathKey<Element>> pathKeys;
     std::span<const ElementProperty<Element>> properties;

@@ -6,11 +6,12 @@
 #include <utility>
 
 #include "include/TracePoint.h"
+#include "providerutilities/Classes.h"
 #include "providerutilities/ProviderUtilities.h"
 
 namespace ZR::DHCPClientProvider {
 
-/// The message of several refusals, also of classes that are no computer system.
+/// The message of several refusals, also of classes that are not computer systems.
 inline constexpr const char* noComputerSystem = "Could not obtain an instance of Computer System";
 inline constexpr const char* noIPProtocolEndpoint =
     "Could not obtain an instance of IP Protocol Endpoint";
@@ -36,7 +37,7 @@ bool takeNext(const CMPIEnumeration* enumeration, CMPIInstance*& instance);
 CMPIObjectPath* pathOf(const CMPIInstance* instance);
 
 /// Fetches instances of one class from the object manager, which other providers
-/// serve, as ends of associations. What the object manager answers belongs to it
+/// serve, as ends of associations. What the object manager returns belongs to it
 /// and is never released here.
 ///
 /// Placed, the adapter stands on the first instance. It is walked so: the first
@@ -45,6 +46,7 @@ CMPIObjectPath* pathOf(const CMPIInstance* instance);
 /// thus never delivered; with one, the usual case, the walk is right.
 ///
 /// A row has, as static members:
+///   Classes::Class servedClass
 ///   RowSource trace
 ///   const char* refusal      what is thrown when the object manager refuses to enumerate
 ///   bool asksBeforeFirst     whether the first element is taken only when one is told of
@@ -53,6 +55,8 @@ CMPIObjectPath* pathOf(const CMPIInstance* instance);
 template <typename Row>
 class ReferencedAdapter {
   public:
+    static constexpr const Classes::Class& servedClass = Row::servedClass;
+
     ReferencedAdapter(const CMPIBroker* mb, const CMPIContext* context, std::string nameSpace)
         : _broker(mb), _context(context), _namespace(std::move(nameSpace)) {
         traceMethod(Row::trace.constructor());
@@ -63,8 +67,7 @@ class ReferencedAdapter {
 
     /// Stands on exactly the instance that the path names. Throws ProviderException
     /// when the object manager has none.
-    template <typename Singly = Row>
-    requires Singly::fetchesSingly void setSingleObjectPath(const CMPIObjectPath* objectPath) {
+    void setSingleObjectPath(const CMPIObjectPath* objectPath) requires(Row::fetchesSingly) {
         const ParameterScope scope(Row::trace.at(__func__), " objectPath=", objectPath);
         instance_ = getReferenced(_broker, _context, objectPath);
         first_ = true;

@@ -22,7 +22,7 @@
 /// Builders move the record's cursor: one record is used by one request.
 namespace ZR::DHCPClientProvider {
 
-/// Shows every key to `visit(position, name)`, in the moniker's order, until that answers
+/// Shows every key to `visit(position, name)`, in the moniker's order, until that returns
 /// true. The moniker stands on the key shown, so that its value can be read.
 template <typename Visit>
 void visitKeys(Moniker& moniker, const Visit& visit) {

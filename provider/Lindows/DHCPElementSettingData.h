@@ -28,7 +28,7 @@ class DHCPElementSettingData : public Instrumentation {
     bool getIsCurrent(unsigned short& isCurrent) const;
 
   private:
-    [[maybe_unused]] unsigned short isCurrent_ = 0;  // set here and read by nobody
+    [[maybe_unused]] unsigned short isCurrent_ = 0;  // set here and never read
 };
 
 }  // namespace ZR::DHCPClientProvider

@@ -3,6 +3,7 @@
 #include <utility>
 
 #include "Lindows/ElementIteration.h"
+#include "providerutilities/Classes.h"
 
 namespace ZR::DHCPClientProvider {
 
@@ -14,8 +15,6 @@ const std::string loggerDHCPProtocolEndpoint = loggerCategory;
 namespace {
 
 const TraceSource source{"Lindows/DHCPProtocolEndpoint", loggerDHCPProtocolEndpoint};
-
-constexpr const char* serviceProcessorName = "BMC:-1";
 
 // Values of EnabledState and RequestedState, and of ClientState (CIM 2.41).
 constexpr unsigned short stateEnabled = 2;
@@ -93,7 +92,7 @@ bool DHCPProtocolEndpoint::getSystemName(std::string& value) const {
 }
 
 bool DHCPProtocolEndpoint::getCreationClassName(std::string& value) const {
-    return constant(ZR_HERE, value, "QVXZR_DHCPProtocolEndpoint");
+    return constant(ZR_HERE, value, Classes::dhcpProtocolEndpoint.name);
 }
 
 bool DHCPProtocolEndpoint::getSystemCreationClassName(std::string& value) const {

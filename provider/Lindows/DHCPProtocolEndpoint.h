@@ -17,7 +17,7 @@ extern const std::string loggerDHCPProtocolEndpoint;
 /// filters, operator bool the DHCP flag: a name filter that stops on an interface
 /// without DHCP thus yields the next one with it, whatever its name.
 ///
-/// A getter answers false, and leaves its output as it was, when the property is
+/// A getter returns false, and leaves its output as it was, when the property is
 /// not supported. Nothing throws. Used by one thread.
 class DHCPProtocolEndpoint {
   public:

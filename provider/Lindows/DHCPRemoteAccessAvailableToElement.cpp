@@ -2,6 +2,7 @@
 
 #include "Lindows/AssociationRecord.h"
 #include "Lindows/DHCPRemoteServiceAccessPoint.h"
+#include "providerutilities/Classes.h"
 
 namespace ZR::DHCPClientProvider {
 
@@ -75,7 +76,7 @@ Moniker DHCPRemoteAccessAvailableToElement::getDHCPProtocolEndpointMoniker(
     endpoint.addKey("Name", nameKey);
     endpoint.addKey("SystemName", systemName.value_or(""));
     endpoint.addKey("SystemCreationClassName", systemClass.value_or(""));
-    endpoint.addKey("CreationClassName", "QVXZR_DHCPProtocolEndpoint");
+    endpoint.addKey("CreationClassName", Classes::dhcpProtocolEndpoint.name);
     return endpoint;
 }
 

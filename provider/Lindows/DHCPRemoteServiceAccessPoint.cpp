@@ -1,6 +1,7 @@
 #include "Lindows/DHCPRemoteServiceAccessPoint.h"
 
 #include "Lindows/ElementIteration.h"
+#include "providerutilities/Classes.h"
 #include "zrcommon/SystemName.h"
 
 namespace ZR::DHCPClientProvider {
@@ -116,7 +117,7 @@ bool DHCPRemoteServiceAccessPoint::getSystemName(std::string& value) const {
 }
 
 bool DHCPRemoteServiceAccessPoint::getCreationClassName(std::string& value) const {
-    return constant(ZR_HERE, value, "QVXZR_DHCPRemoteServiceAccessPoint");
+    return constant(ZR_HERE, value, Classes::dhcpRemoteServiceAccessPoint.name);
 }
 
 bool DHCPRemoteServiceAccessPoint::getSystemCreationClassName(std::string& value) const {

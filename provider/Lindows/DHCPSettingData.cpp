@@ -69,7 +69,7 @@ bool DHCPSettingData::getInstanceID(std::string& value) const {
     std::string name;
     getElementName(name);
     const std::string description = readSystemDescription(cursor_, ZR_HERE, "systemNode");
-    value = description == serviceProcessorDescription ? description : "Computer";
+    value = description == serviceProcessorDescription ? description : computerDescription;
     value += '%';
     value += name;
     return true;

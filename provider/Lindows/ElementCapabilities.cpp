@@ -28,7 +28,7 @@ Moniker ElementCapabilities::getDHCPCapabilitiesMoniker(Moniker& monikerDHCPEndp
     const ParameterScope scope(ZR_HERE, " monikerDHCPEndpoint=", &monikerDHCPEndpoint);
     const std::string endpointName =
         requireKey(monikerDHCPEndpoint, "Name", "Could not find 'Name' Key in Moniker", ZR_HERE);
-    // No match is no failure: the name is then that of the last interface.
+    // That nothing matches is not a failure: the name is then that of the last interface.
     std::string name;
     walkTo(*this, NodeType::NetworkInterface, [&](const auto& interface) {
         if (!interface.getProperty(Properties::Name, name)) {

@@ -4,6 +4,7 @@
 
 #include <array>
 
+#include "providerutilities/Classes.h"
 #include "zrcommon/SystemName.h"
 
 namespace ZR::DHCPClientProvider {
@@ -21,7 +22,7 @@ std::string readSystemDescription(const Instrumentation& cursor, const TracePoin
 
 const char* systemClassOf(const std::string& systemDescription) {
     return systemDescription == serviceProcessorDescription ? "QVXZR_SPComputerSystem"
-                                                            : "QVXZR_ComputerSystem";
+                                                            : Classes::computerSystem.name;
 }
 
 bool readHostName(std::string& name, const TracePoint& at) {

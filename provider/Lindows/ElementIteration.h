@@ -14,6 +14,10 @@ namespace ZR::DHCPClientProvider {
 
 /// The description of the node above the service processor's interfaces.
 inline constexpr const char* serviceProcessorDescription = "BMC";
+/// The name of the service processor as a computer.
+inline constexpr const char* serviceProcessorName = "BMC:-1";
+/// What stands for any other computer in an identifier.
+inline constexpr const char* computerDescription = "Computer";
 
 /// The description of the node two levels above the cursor's; empty when it cannot
 /// be read. Traced as a variable of the name given.

@@ -2,6 +2,7 @@
 
 #include "Lindows/AssociationRecord.h"
 #include "Lindows/DHCPProtocolEndpoint.h"
+#include "providerutilities/Classes.h"
 
 namespace ZR::DHCPClientProvider {
 
@@ -41,8 +42,8 @@ Moniker SAPSAPDependency::getIPSAPMoniker(Moniker& moniker) {
     Moniker endpoint;
     endpoint.addKey("Name", keys.name);
     endpoint.addKey("SystemName", keys.systemName);
-    endpoint.addKey("CreationClassName", "QVXZR_IPProtocolEndpoint");
-    endpoint.addKey("SystemCreationClassName", "QVXZR_ComputerSystem");
+    endpoint.addKey("CreationClassName", Classes::ipProtocolEndpoint.name);
+    endpoint.addKey("SystemCreationClassName", Classes::computerSystem.name);
     return endpoint;
 }
 

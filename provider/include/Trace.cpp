@@ -122,7 +122,7 @@ void formatWhole(char* out, std::index_sequence<index...> /*all*/, const Argumen
     putLiteral.template operator()<sizeof...(index)>();
 }
 
-/// Formats what of the text fits into the buffer; answers the size.
+/// Formats what of the text fits into the buffer; returns the size.
 template <std::size_t count>
 std::size_t formatCut(Buffer& buffer, const Format& format,
                       const std::array<std::string_view, count>& arguments) {

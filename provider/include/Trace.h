@@ -27,7 +27,7 @@ enum MessageType : unsigned int {
 inline constexpr std::size_t traceBufferSize = 512;
 
 // Each of these formats one line into a buffer of its own, one per thread, and
-// answers the buffer: the text is valid until the same helper is called again on
+// returns the buffer: the text is valid until the same helper is called again on
 // the same thread. Numbers are written as signed decimals of 32 bits.
 
 /// VARIABLE: 'variable' has Value 'value' at line N in file

@@ -54,7 +54,7 @@ struct RowSource {
     [[nodiscard]] TracePoint destructor() const { return at(destructorName); }
 };
 
-/// Hands a line to both roads of the logging service. The text is formatted anew
+/// Hands a line to both channels of the logging service, log and trace. The text is formatted anew
 /// for the second, since the first may have traced on its own.
 template <typename Text>
 void writeLine(const TracePoint& at, int level, const Text& text) {

@@ -5,7 +5,7 @@
 
 namespace {
 
-bool fails = false;
+ZR::Testing::HostName current = ZR::Testing::HostName::real;
 
 }  // namespace
 
@@ -15,9 +15,13 @@ extern "C" int __real_gethostname(char* name, std::size_t size);
 extern "C" int __wrap_gethostname(char* name, std::size_t size);
 
 int __wrap_gethostname(char* name, std::size_t size) {
-    if (fails) {
+    if (current == ZR::Testing::HostName::fails) {
         errno = EFAULT;
         return -1;
+    }
+    if (current == ZR::Testing::HostName::isEmpty && size > 0) {
+        *name = '\0';
+        return 0;
     }
     return __real_gethostname(name, size);
 }
@@ -25,11 +29,11 @@ int __wrap_gethostname(char* name, std::size_t size) {
 
 namespace ZR::Testing {
 
-HostNameFails::HostNameFails() {
-    fails = true;
+FakeHostName::FakeHostName(HostName behaviour) {
+    current = behaviour;
 }
-HostNameFails::~HostNameFails() {
-    fails = false;
+FakeHostName::~FakeHostName() {
+    current = HostName::real;
 }
 
 }  // namespace ZR::Testing

@@ -2,15 +2,27 @@
 
 namespace ZR::Testing {
 
-/// The kernel's gethostname does not fail on its own. Programs that link kit_host_name
-/// have this one in its place, which fails with EFAULT as long as one of these lives,
-/// and asks the kernel otherwise.
-class HostNameFails {
+enum class HostName { real, fails, isEmpty };
+
+/// What gethostname does during the life of one of these. The kernel's does not fail on
+/// its own, so programs that link kit_host_name have one in its place, which fails with
+/// EFAULT or tells an empty name on demand, and asks the kernel otherwise.
+class FakeHostName {
   public:
-    HostNameFails();
-    ~HostNameFails();
-    HostNameFails(const HostNameFails&) = delete;
-    HostNameFails& operator=(const HostNameFails&) = delete;
+    explicit FakeHostName(HostName behaviour);
+    ~FakeHostName();
+    FakeHostName(const FakeHostName&) = delete;
+    FakeHostName& operator=(const FakeHostName&) = delete;
+};
+
+class HostNameFails : public FakeHostName {
+  public:
+    HostNameFails() : FakeHostName(HostName::fails) {}
+};
+
+class HostNameIsEmpty : public FakeHostName {
+  public:
+    HostNameIsEmpty() : FakeHostName(HostName::isEmpty) {}
 };
 
 }  // namespace ZR::Testing

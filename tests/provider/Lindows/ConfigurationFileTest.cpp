@@ -93,7 +93,7 @@ void fill(const std::string& path, const std::string& content) {
 }
 
 /// Takes the calling child into a mount name space. Without privileges it stays its own
-/// user and group in the user name space that comes with it: nobody else could make files there.
+/// user and group in the user name space that comes with it: no other user could make files there.
 void enterMountNamespace() {
     const std::string user = std::to_string(::geteuid());
     const std::string group = std::to_string(::getegid());

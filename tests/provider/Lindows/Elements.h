@@ -24,7 +24,7 @@ using ZR::Testing::LogRecord;
 inline constexpr const char* untouched = "untouched";
 inline constexpr unsigned short untouchedNumber = 77;
 
-/// A text getter's output, or nothing when it answers false; then nothing is written.
+/// A text getter's output, or nothing when it returns false; then nothing is written.
 template <typename Element>
 std::optional<std::string> text(const Element& element,
                                 bool (Element::*getter)(std::string&) const) {

@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <stdexcept>
 #include <string>
 #include <vector>
 
@@ -169,10 +170,7 @@ TEST_F(AssociationsTest, RolesChangeNothing) {
 }
 
 TEST_F(AssociationsTest, UnknownAssociationClassIsAnEmptySuccessForNamesAndInvalidForInstances) {
-    const LogCapture capture;
     const Host::Answer names = host_.associatorNames(endpoint("eth0"), "CIM_NoSuchClass");
-    EXPECT_THAT(capture.logMessages(),
-                Contains(HasSubstr("'CMPI_RC_ERR_INVALID_CLASS' has Value '5'")));
     EXPECT_EQ(names.code, CMPI_RC_OK);
     EXPECT_THAT(names.paths, IsEmpty());
     EXPECT_EQ(names.returnDoneCalls, 1U);
@@ -181,6 +179,36 @@ TEST_F(AssociationsTest, UnknownAssociationClassIsAnEmptySuccessForNamesAndInval
     EXPECT_FALSE(instances.hasMessage);
     EXPECT_THAT(instances.instances, IsEmpty());
     EXPECT_EQ(instances.returnDoneCalls, 1U);
+}
+
+TEST_F(AssociationsTest, UnknownAssociationClassIsTracedOnceByItsHandlerAndAKnownOneIsNot) {
+    const auto traced = [this](bool names, const char* association) {
+        const LogCapture log;
+        if (names) {
+            host_.associatorNames(endpoint("eth0"), association);
+        } else {
+            host_.associators(endpoint("eth0"), association);
+        }
+        EXPECT_EQ(log.logMessages(), log.traceMessages());
+        std::vector<ZR::Testing::LogRecord> lines = log.log();
+        std::erase_if(lines, [](const auto& line) {
+            return line.message.find("CMPI_RC_ERR_INVALID_CLASS") == std::string::npos;
+        });
+        return lines;
+    };
+    for (const bool names : {true, false}) {
+        const auto lines = traced(names, "CIM_NoSuchClass");
+        ASSERT_THAT(lines, SizeIs(1));
+        EXPECT_EQ(lines[0].level, 4000);
+        EXPECT_EQ(lines[0].file, "DHCPClientProvider");
+        EXPECT_EQ(lines[0].function,
+                  names ? "DHCPClient_AssociatorNames" : "DHCPClient_Associators");
+        EXPECT_THAT(lines[0].message,
+                    ::testing::MatchesRegex("VARIABLE: 'CMPI_RC_ERR_INVALID_CLASS' has Value '5' "
+                                            "at line [0-9]+ in DHCPClientProvider"));
+        EXPECT_THAT(traced(names, hosted), IsEmpty());
+        EXPECT_THAT(traced(names, "CIM_HostedAccessPoint"), IsEmpty());
+    }
 }
 
 TEST_F(AssociationsTest, ElementClassAsAssociationClassIsInvalidAndLeavesTheResultOpen) {
@@ -436,7 +464,90 @@ TEST_F(AssociationsTest, EndWithoutAPathLeavesItsReferenceOut) {
     EXPECT_NE(instances.instances[0]->property("Dependent"), nullptr);
 }
 
+// Several computers from the broker. It has three of one name, and hands out the first
+// two: the last of several is never delivered.
+
+class SeveralComputersTest : public AssociationsTest {
+  protected:
+    void SetUp() override {
+        AssociationsTest::SetUp();
+        std::vector<test::Json> computers;
+        for (const char* name : {"eth0", "eth1", "eth2"}) {
+            computers.push_back(host({test::dhcpInterface(name, {"192.0.2.1"})}));
+        }
+        setTree(computers);
+        // A walk that does not end is ended here, long after it had to.
+        for (const Function function : {Function::returnObjectPath, Function::returnInstance}) {
+            host_.counted().watch(function, [this, function] {
+                if (host_.counted().calls(function) > 100) {
+                    throw std::runtime_error("the walk does not end");
+                }
+            });
+            if (function == Function::returnObjectPath) {
+                names_ = host_.enumerateNames(pathOf("QVXZR_DHCPRemoteHostedAccessPoint"));
+            } else {
+                instances_ = host_.enumerate(pathOf("QVXZR_DHCPRemoteHostedAccessPoint"));
+            }
+        }
+    }
+
+    Host::Answer names_;
+    Host::Answer instances_;
+};
+
+TEST_F(SeveralComputersTest, WalkOverRemoteHostedAccessPointsEndsWithTheAccessPoints) {
+    const Texts expected =
+        ofHost(Texts{"DHCPRemoteHostedAccessPoint Antecedent[ComputerSystem @] "
+                     "Dependent[DHCPRemoteServiceAccessPoint @ eth0_IPv4]",
+                     "DHCPRemoteHostedAccessPoint Antecedent[ComputerSystem @] "
+                     "Dependent[DHCPRemoteServiceAccessPoint @ eth1_IPv4]",
+                     "DHCPRemoteHostedAccessPoint Antecedent[ComputerSystem @] "
+                     "Dependent[DHCPRemoteServiceAccessPoint @ eth2_IPv4]"});
+    EXPECT_EQ(briefs(names_), expected);
+    EXPECT_EQ(briefs(instances_), expected);
+}
+
+TEST_F(SeveralComputersTest, WalkOverHostedPointsGoesThroughTheEndpointsOfEachComputer) {
+    const auto pair = [](const std::string& name) {
+        return ofHost(
+            "HostedDHCPPoint Antecedent[ComputerSystem @] Dependent[DHCPProtocolEndpoint "
+            "@ " +
+            name + "]");
+    };
+    EXPECT_EQ(briefs(host_.enumerateNames(pathOf(hosted))),
+              (Texts{pair("eth0"), pair("eth1"), pair("eth2"), pair("eth0"), pair("eth1"),
+                     pair("eth2")}));
+}
+
+TEST_F(SeveralComputersTest, EndpointAndAccessPointReachAllButTheLast) {
+    const Texts computers = ofHost(Texts{"ComputerSystem @", "ComputerSystem @"});
+    EXPECT_EQ(briefs(host_.associatorNames(endpoint("eth1"), hosted)), computers);
+    EXPECT_EQ(briefs(host_.associators(endpoint("eth1"), hosted)), computers);
+    EXPECT_THAT(briefs(host_.referenceNames(endpoint("eth1"), hosted)), SizeIs(2));
+    const auto accessPoint = pathOf("QVXZR_DHCPRemoteServiceAccessPoint",
+                                    {{"SystemName", hostName()}, {"Name", "eth1_IPv4"}});
+    constexpr const char* remoteHosted = "QVXZR_DHCPRemoteHostedAccessPoint";
+    EXPECT_EQ(briefs(host_.associatorNames(accessPoint, remoteHosted)), computers);
+    EXPECT_EQ(briefs(host_.associators(accessPoint, remoteHosted)), computers);
+    EXPECT_THAT(briefs(host_.referenceNames(accessPoint, remoteHosted)), SizeIs(2));
+}
+
 // Failures in one association.
+
+TEST_F(AssociationsTest, EveryAssociationIsTracedAsServedAlsoTheOneThatFailed) {
+    Host withoutNeighbours;
+    const LogCapture log(4000, 6000);
+    withoutNeighbours.associatorNames(endpoint("eth2"), nullptr);
+    std::vector<std::string> codes;
+    for (const auto& line : log.log()) {
+        if (line.message.starts_with("VARIABLE: 'rcode'")) {
+            EXPECT_EQ(line.level, 4000);
+            EXPECT_EQ(line.function, "DHCPClient_AssociatorNames");
+            codes.push_back(line.message.substr(0, line.message.find(" at line")));
+        }
+    }
+    EXPECT_EQ(codes, Texts(7, "VARIABLE: 'rcode' has Value '1'"));
+}
 
 TEST_F(AssociationsTest, FailureInOneAssociationIsSilentForNamesAndLoggedForInstances) {
     Host withoutNeighbours;

@@ -31,7 +31,7 @@ std::string place(const LogRecord& record) {
     return " in Some/File [Line: " + std::to_string(record.line) + "]";
 }
 
-/// Both roads got the same; answers what.
+/// Both channels got the same; returns what.
 std::vector<LogRecord> sameOnBothRoads(const LogCapture& capture) {
     std::vector<LogRecord> logged = capture.log();
     std::vector<LogRecord> traced = capture.trace();

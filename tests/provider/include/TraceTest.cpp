@@ -140,7 +140,7 @@ TEST(Trace, TextIsValidUntilTheNextCallOfTheSameHelper) {
     EXPECT_STREQ(plain, "ENTERING: g() in f [Line: 1]");
     EXPECT_STREQ(withParameters, "ENTERING: g() in f [Line: 1],Parameters List: first");
 
-    // The next call uses the same buffer, so a text is no one's to keep.
+    // The next call uses the same buffer, so a text must not be kept.
     EXPECT_EQ(trace("v", "f", 2, "second"), text);
     EXPECT_EQ(trace("v", "f", 2, 2U), number);
     EXPECT_EQ(trace("f", "g", 2, exiting), plain);

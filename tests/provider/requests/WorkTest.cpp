@@ -22,7 +22,7 @@ using test::Host;
 using test::Request;
 
 /// A count by the number N of interfaces: constant + linear N + pairs N (N - 1) / 2.
-/// Pairs come of a prescribed walk from the first interface to the Nth, for each of N.
+/// Pairs come of a walk, on which clients rely, from the first interface to the Nth, for each of N.
 struct Growth {
     std::uint64_t constant = 0;
     std::uint64_t linear = 0;

@@ -1,0 +1,42 @@
+# Compiles a row as it is, which must succeed, and with a copy of its table for each
+# field in which that field's name is misspelt, each of which must be an error.
+# Usage: cmake -DCOMPILER=... -DINCLUDES=DIR;... -DROW=Row.cpp -DWORK=DIR -P CompileRows.cmake
+set(flags -std=c++20 -fsyntax-only)
+foreach(directory IN LISTS INCLUDES)
+    list(APPEND flags -I${directory})
+endforeach()
+file(MAKE_DIRECTORY ${WORK})
+
+function(compile text)
+    file(WRITE ${WORK}/Row.cpp "${text}")
+    execute_process(COMMAND ${COMPILER} ${flags} ${WORK}/Row.cpp
+        RESULT_VARIABLE result OUTPUT_VARIABLE output ERROR_VARIABLE output)
+    set(result ${result} PARENT_SCOPE)
+    set(output "${output}" PARENT_SCOPE)
+endfunction()
+
+file(READ ${ROW} row)
+compile("${row}")
+if(NOT result EQUAL 0)
+    message(FATAL_ERROR "The row as it is does not compile:\n${output}")
+endif()
+
+string(REGEX REPLACE ".*WholeRow::associationClass({.*\n};).*" "\\1" table "${row}")
+string(REGEX MATCHALL "\n    \\.[A-Za-z]+ =" fields "${table}")
+list(LENGTH fields count)
+if(NOT count EQUAL 11)
+    message(FATAL_ERROR "${count} fields found in ${ROW}")
+endif()
+set(broken "${row}\nnamespace ZR::DHCPClientProvider {\n")
+foreach(field IN LISTS fields)
+    string(REGEX REPLACE "[^A-Za-z]" "" name "${field}")
+    string(REPLACE ".${name} =" ".${name}Misspelt =" copy "${table}")
+    string(APPEND broken "const AssociationClass<WholeRow> ${name}Copy${copy}\n")
+endforeach()
+compile("${broken}}\n")
+foreach(field IN LISTS fields)
+    string(REGEX REPLACE "[^A-Za-z]" "" name "${field}")
+    if(NOT output MATCHES "error:[^\n]*[^A-Za-z]${name}Misspelt[^A-Za-z]")
+        message(SEND_ERROR "\"${name}\" may be misspelt:\n${output}")
+    endif()
+endforeach()
