@@ -2,6 +2,7 @@
 # field in which that field's name is misspelt, each of which must be an error.
 # Usage: cmake -DCOMPILER=... -DINCLUDES=DIR;... -DROW=Row.cpp -DWORK=DIR -P CompileRows.cmake
 set(flags -std=c++20 -fsyntax-only)
+list(REMOVE_ITEM INCLUDES "")
 foreach(directory IN LISTS INCLUDES)
     list(APPEND flags -I${directory})
 endforeach()
