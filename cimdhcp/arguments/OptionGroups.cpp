@@ -44,7 +44,7 @@ void addLimits(CLI::App& app, cimom::wbem::Limits& limits) {
     number("--io-threads", limits.ioThreads, "Threads that read and send (2)");
     seconds("--request-timeout", limits.request,
             "For a request to arrive, and again for its operation (30)");
-    seconds("--answer-timeout", limits.answer, "For a client to take its response (300)");
+    seconds("--answer-timeout", limits.response, "For a client to take its response (300)");
     seconds("--enumeration-timeout", limits.sessions.defaultTimeout,
             "Silence after which an open enumeration is forgotten (60)");
     seconds("--max-enumeration-timeout", limits.sessions.longestTimeout,

@@ -3,7 +3,8 @@
 #include <string>
 #include <string_view>
 
-#include "cimom/Cim.h"
+#include "cimom/ObjectPath.h"
+#include "cimom/Status.h"
 #include "client/Response.h"
 
 namespace cimdhcp {

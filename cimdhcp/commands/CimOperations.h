@@ -1,7 +1,7 @@
 #pragma once
 
 #include "arguments/Commands.h"
-#include "cimom/Cim.h"
+#include "cimom/ObjectPath.h"
 #include "client/Client.h"
 #include "client/Response.h"
 

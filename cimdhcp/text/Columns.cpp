@@ -2,7 +2,7 @@
 
 #include <utility>
 
-#include "cimom/Cim.h"
+#include "cimom/Names.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
 

@@ -7,7 +7,7 @@
 #include <variant>
 #include <vector>
 
-#include "cimom/Cim.h"
+#include "cimom/Instance.h"
 
 namespace cimdhcp {
 

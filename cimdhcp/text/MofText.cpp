@@ -8,6 +8,7 @@
 #include <type_traits>
 #include <variant>
 
+#include "cimom/Instance.h"
 #include "cimom/ObjectPathText.h"
 #include "zrcommon/Strings.h"
 

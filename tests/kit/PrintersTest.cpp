@@ -13,8 +13,8 @@
 #include <vector>
 
 #include "arguments/CommandLine.h"
-#include "cimom/Cim.h"
-#include "clients/Lease.h"
+#include "cimom/Instance.h"
+#include "facts/ClientFacts.h"
 #include "wbem/Limits.h"
 #include "zrclient/Snapshot.h"
 

@@ -9,7 +9,7 @@
 #include <string>
 #include <utility>
 
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"
 #include "sources/JsonTree.h"
 #include "zrclient/InstrumentationService.h"

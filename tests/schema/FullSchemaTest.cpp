@@ -10,6 +10,7 @@
 #include <map>
 
 #include "ShippedSchema.h"
+#include "cimom/Instance.h"
 
 namespace cimom {
 namespace {

@@ -4,7 +4,6 @@
 
 #include <filesystem>
 
-#include "client/Failure.h"
 #include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"
 #include "text/Failure.h"

@@ -49,7 +49,7 @@ TEST(ServeOptions, EachLimitIsItsOwn) {
     serve.limits.stuck = 10;
     serve.limits.ioThreads = 11;
     serve.limits.request = std::chrono::seconds(12);
-    serve.limits.answer = std::chrono::seconds(13);
+    serve.limits.response = std::chrono::seconds(13);
     serve.limits.sessions.defaultTimeout = std::chrono::seconds(14);
     serve.limits.sessions.longestTimeout = std::chrono::seconds(15);
     std::vector<std::string> arguments;

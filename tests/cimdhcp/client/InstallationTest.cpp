@@ -4,7 +4,7 @@
 
 #include <filesystem>
 
-#include "kit/Files.h"
+#include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"
 #include "text/Failure.h"
 

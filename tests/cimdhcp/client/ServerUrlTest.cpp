@@ -5,7 +5,6 @@
 
 #include <sstream>
 
-#include "client/Failure.h"
 #include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"
 #include "text/Failure.h"

@@ -1,3 +1,4 @@
+#include "cimom/Instance.h"
 #include "cimom/ObjectPathText.h"
 
 #include <gtest/gtest.h>

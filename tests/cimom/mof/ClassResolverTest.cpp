@@ -1,3 +1,4 @@
+#include "cimom/Instance.h"
 #include "mof/ClassResolver.h"
 
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+#include "cimom/Instance.h"
 #include "mof/MofValue.h"
 
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+#include "cimom/Instance.h"
 #include "cimom/MofError.h"
 #include "mof/QualifierTypes.h"
 

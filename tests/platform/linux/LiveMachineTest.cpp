@@ -242,7 +242,7 @@ TEST_F(LiveMachineTest, AMachineThatDoesNotTellItsNameShowsItsInterfaces) {
         EXPECT_EQ(tree->node(0).description, "Computer");
         EXPECT_EQ(tree->find(0, Properties::Name)->value, PropertyValue{});
         EXPECT_THAT(tree->remarks(), ElementsAre("the system does not tell its name: Bad address"));
-        EXPECT_THAT(complaints_, ElementsAre("the system does not tell its name: Bad address"));
+        EXPECT_THAT(diagnostics_, ElementsAre("the system does not tell its name: Bad address"));
     }
     EXPECT_TRUE(machine.changed()) << "to be read again";
     EXPECT_EQ(machine.read()->find(0, Properties::Name)->value, PropertyValue{getSystemName()});

@@ -84,7 +84,7 @@ TEST(ElementLists, EmptyListThatIsKnownIsAnEmptyArrayAndOneThatIsNotKnownIsLeftO
     };
     Host host;
     const Host::Answer answer = host.request(
-        cimom::broker::ResultCollector::Kind::instances, test::pathOf("QVXZR_DHCPProtocolEndpoint"),
+        Host::Kind::instances, test::pathOf("QVXZR_DHCPProtocolEndpoint"),
         [&](auto* /*context*/, auto* result, auto* path) {
             return result->ft->returnInstance(
                 result, makeInstance<ElementWithLists>(host.broker(), path, {}, properties));

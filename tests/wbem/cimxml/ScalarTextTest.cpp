@@ -1,3 +1,4 @@
+#include "cimom/Instance.h"
 #include "cimxml/ScalarText.h"
 
 #include <gtest/gtest.h>
