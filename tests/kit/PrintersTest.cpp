@@ -100,9 +100,12 @@ TEST(Printers, AValueTellsItsTypeAndItsContent) {
 }
 
 TEST(Printers, ALeaseTellsItsFields) {
-    Live::Lease lease;
-    lease.ifindex = 4711;
-    lease.origin = "/var/lib/dhcp/dhclient.leases";
+    const Live::Lease lease{.interfaceName = std::nullopt,
+                            .ifindex = 4711,
+                            .address = Live::IpAddress::ipv4FromText("192.0.2.17").value(),
+                            .server = std::nullopt,
+                            .expires = std::nullopt,
+                            .origin = "/var/lib/dhcp/dhclient.leases"};
     const std::vector<Live::Lease> leases{lease};
     EXPECT_THAT(testing::PrintToString(leases),
                 testing::AllOf(testing::StartsWith("{ {"), testing::HasSubstr("4711"),
