@@ -20,7 +20,8 @@ from arrows import read_arrows
 # A header of the room's include/ stands as high as the folder of its source, or, if it has
 # none, as what it includes.
 ORDERS = {
-    "platform/linux": [["formats", "kernel"], ["clients", "configuration", "ipmi"], ["."]],
+    "platform/linux": [["formats"], ["kernel", "ipmi"], ["facts"],
+                       ["clients", "configuration"], ["."]],
     "provider": [["include"], ["Lindows"], ["CMPI"], ["."]],
     "cimom": [["model"], ["mof"], ["broker", "broker/objects"], ["manager"]],
     "wbem/server": [["operations"], ["http"]],
