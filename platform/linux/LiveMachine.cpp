@@ -156,7 +156,7 @@ std::shared_ptr<const Snapshot> LiveMachine::tryToRead() {
                    .links = std::move(network.links),
                    .addresses = std::move(network.addresses),
                    .clients = std::move(clients),
-                   .serviceProcessor = std::move(processor)},
+                   .serviceProcessor = processor},
                   surroundings_.now(), surroundings_.explain);
 }
 

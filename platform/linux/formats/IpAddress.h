@@ -39,6 +39,8 @@ class IpAddress {
     [[nodiscard]] std::string text() const;
 
     friend bool operator==(const IpAddress&, const IpAddress&) noexcept = default;
+    // clang-tidy 14 takes the 0 that a defaulted comparison compares with for a pointer.
+    // NOLINTNEXTLINE(modernize-use-nullptr)
     friend std::strong_ordering operator<=>(const IpAddress&, const IpAddress&) noexcept = default;
 
   private:
