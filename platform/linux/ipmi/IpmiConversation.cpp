@@ -160,7 +160,7 @@ void IpmiConversation::conclude(std::uint8_t channel) {
         take(address_, lan.address, "address");
     }
     if (state_ == State::Underway) {
-        lan_ = std::move(lan);
+        lan_ = lan;
         state_ = State::Finished;
     }
 }
