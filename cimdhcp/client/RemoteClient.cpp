@@ -7,6 +7,7 @@
 #include "cimom/Names.h"
 #include "cimxml/ClassReader.h"
 #include "cimxml/Errors.h"
+#include "cimxml/HttpStatus.h"
 #include "client/StatusMessage.h"
 #include "text/DisplayText.h"
 #include "text/ValueMeaning.h"
@@ -17,11 +18,9 @@ namespace {
 
 using cimom::wbem::OperationRequest;
 using cimom::wbem::OperationResponse;
+namespace http = cimom::wbem::http;
 
 constexpr std::size_t deepestXml = 64;
-constexpr unsigned httpOk = 200;
-constexpr unsigned httpUnauthorized = 401;
-constexpr unsigned httpForbidden = 403;
 /// The schema of the standard's own classes, none of which an implementation serves.
 constexpr std::string_view standardSchema = "CIM_";
 
@@ -36,16 +35,16 @@ std::string excerpt(const std::string& text) {
 }
 
 void checkStatus(const HttpResponse& response, const HttpSettings& settings) {
-    if (response.status == httpOk) {
+    if (response.status == http::ok) {
         return;
     }
-    if (response.status == httpUnauthorized) {
+    if (response.status == http::unauthorized) {
         fail(settings.credential
                  ? "HTTP 401: it refuses user " + printable(settings.credential->user) +
                        " with that password"
                  : "HTTP 401: it wants a user and a password; --credentials FILE holds them");
     }
-    if (response.status == httpForbidden) {
+    if (response.status == http::forbidden) {
         fail("HTTP 403: it does not permit this");
     }
     const std::string* const cimError = response.header("CIMError");
