@@ -65,8 +65,8 @@ bool EmbeddedClient::mayServe(std::string_view className) const {
 
 MachineInterfaces EmbeddedClient::interfaces(const ServedInstances& /*served*/) {
     const auto snapshot = ZR::InstrumentationService::process().current();
-    const auto remarks = snapshot->remarks();
-    return {interfacesOf(*snapshot), {remarks.begin(), remarks.end()}};
+    const auto diagnostics = snapshot->diagnostics();
+    return {interfacesOf(*snapshot), {diagnostics.begin(), diagnostics.end()}};
 }
 
 std::optional<std::string> EmbeddedClient::dataDir() const {

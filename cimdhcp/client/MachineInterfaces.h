@@ -41,7 +41,7 @@ struct InterfaceOverview {
 
 struct MachineInterfaces {
     std::vector<InterfaceOverview> interfaces;
-    std::vector<std::string> remarks;  ///< on what could not be read of the machine
+    std::vector<ZR::Diagnostic> diagnostics;  ///< on what could not be read of the machine
 
     bool operator==(const MachineInterfaces&) const = default;
 };

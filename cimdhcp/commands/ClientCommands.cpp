@@ -31,7 +31,7 @@ class Execution {
         MachineInterfaces machine = client_.interfaces(served);
         addServed(served, client_.classes(), machine.interfaces);
         return {list(overviewColumns(), std::move(machine.interfaces), overviewTable, overviewJson),
-                remarkLine(machine.remarks), std::nullopt};
+                diagnosticLine(machine.diagnostics), std::nullopt};
     }
 
     Outcome operator()(const ClassesCommand& /*command*/) const {

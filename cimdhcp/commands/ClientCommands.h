@@ -13,7 +13,7 @@ namespace cimdhcp {
 /// The outcome of a command.
 struct Outcome {
     std::string text;                ///< for standard output
-    std::string remarks;             ///< for standard error
+    std::string diagnostics;         ///< for standard error
     std::optional<Failure> failure;  ///< what ends the program when both are written
 };
 

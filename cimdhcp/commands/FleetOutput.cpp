@@ -75,8 +75,8 @@ void FleetOutput::show(ServerReport&& report) {
     progress_.hide();
     ++arrived_;
     outputs_.out << (presentation_.json() ? jsonOf(report) : textOf(report)) << std::flush;
-    if (!report.outcome.remarks.empty()) {
-        outputs_.err << nameOf(report) << ": " << report.outcome.remarks;
+    if (!report.outcome.diagnostics.empty()) {
+        outputs_.err << nameOf(report) << ": " << report.outcome.diagnostics;
     }
     if (report.outcome.failure) {
         failures_.emplace_back(report.server, report.outcome.failure->what());

@@ -65,18 +65,18 @@ std::string overviewTable(const std::vector<InterfaceOverview>& interfaces,
            (noneUsesDhcp && style.header ? "No interface of this machine uses DHCP.\n" : "");
 }
 
-std::string remarkLine(std::span<const std::string> remarks) {
-    if (remarks.empty()) {
+std::string diagnosticLine(std::span<const ZR::Diagnostic> diagnostics) {
+    if (diagnostics.empty()) {
         return {};
     }
     constexpr std::size_t mostTold = 4;
     std::string line = "cimdhcp: not everything could be read: ";
-    for (const std::string& remark : remarks.first(std::min(remarks.size(), mostTold))) {
-        line += (&remark == &remarks.front() ? "" : "; ") + printable(remark);
+    for (const ZR::Diagnostic& each : diagnostics.first(std::min(diagnostics.size(), mostTold))) {
+        line += (&each == &diagnostics.front() ? "" : "; ") + printable(each.text);
     }
-    if (remarks.size() > mostTold) {
-        line +=
-            "; and " + std::to_string(remarks.size() - mostTold) + " more, which are in the log";
+    if (diagnostics.size() > mostTold) {
+        line += "; and " + std::to_string(diagnostics.size() - mostTold) +
+                " more, which are in the log";
     }
     return line + '\n';
 }

@@ -31,6 +31,6 @@ namespace cimdhcp {
 
 /// One line for what could not be read of the machine, with the first few of many;
 /// empty when there was nothing.
-[[nodiscard]] std::string remarkLine(std::span<const std::string> remarks);
+[[nodiscard]] std::string diagnosticLine(std::span<const ZR::Diagnostic> diagnostics);
 
 }  // namespace cimdhcp

@@ -92,7 +92,7 @@ class Execution {
         const auto client = openClient(line_.options);
         const Outcome outcome = carryOut(line_.command, *client, presentation_);
         outputs_.out << outcome.text;
-        outputs_.err << outcome.remarks;
+        outputs_.err << outcome.diagnostics;
         if (outcome.failure) {
             throw Failure(*outcome.failure);
         }

@@ -101,8 +101,8 @@ std::shared_ptr<const Snapshot> decide(MachineFacts facts, std::int64_t now, Exp
         }
         addServiceProcessor(*machine.serviceProcessor(), builder);
     }
-    for (const std::string& diagnostic : machine.diagnostics()) {
-        builder.remark(diagnostic);
+    for (const Diagnostic& diagnostic : machine.diagnostics()) {
+        builder.diagnostic(diagnostic);
     }
     return builder.build();
 }

@@ -31,7 +31,7 @@ struct Decision {
 [[nodiscard]] std::vector<Decision> decide(InterfaceView view);
 
 /// The tree of a machine: the computer, its network, and the interfaces in it; behind
-/// it the service processor, where there is one; and what could not be read as remarks.
+/// it the service processor, where there is one; and what could not be read as diagnostics.
 /// Depends on nothing but the facts and the time, in seconds since the epoch.
 [[nodiscard]] std::shared_ptr<const Snapshot> decide(MachineFacts facts, std::int64_t now,
                                                      Explain explain = Explain::No);

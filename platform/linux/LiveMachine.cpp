@@ -69,10 +69,11 @@ void markWireless(const Roots& roots, std::vector<Link>& links) {
 }
 
 /// Several readers may report the same.
-void removeRepeated(std::vector<std::string>& diagnostics) {
+void removeRepeated(std::vector<Diagnostic>& diagnostics) {
     std::unordered_set<std::string> met;
-    std::erase_if(diagnostics,
-                  [&](const std::string& diagnostic) { return !met.insert(diagnostic).second; });
+    std::erase_if(diagnostics, [&](const Diagnostic& diagnostic) {
+        return !met.insert(diagnostic.text).second;
+    });
 }
 
 void reportToLog(std::string_view message) {
@@ -106,7 +107,7 @@ bool LiveMachine::socketsChanged() const {
     if (!sockets_) {
         return false;
     }
-    std::vector<std::string> ignored;  // what cannot be read shows as a change
+    std::vector<Diagnostic> ignored;  // what cannot be read shows as a change
     return readSockets(surroundings_.roots, ignored) != sockets_;
 }
 
@@ -145,7 +146,7 @@ std::shared_ptr<const Snapshot> LiveMachine::tryToRead() {
     markWireless(surroundings_.roots, network.links);
     SystemName system = readSystemName();
     if (system.name.empty()) {
-        clients.diagnostics.push_back(std::move(system.diagnostic));
+        clients.diagnostics.emplace_back(std::move(system.diagnostic));
     }
     planAnotherTry(clients.diagnostics);
     // The service processor is asked again at its own pace.
@@ -172,7 +173,7 @@ void LiveMachine::consultNetworkd(ClientFacts& clients) {
     const NetworkdResponse response =
         surroundings_.askNetworkd(std::chrono::steady_clock::now() + networkdTime);
     if (!response.reason.empty()) {
-        clients.diagnostics.push_back(response.reason);
+        clients.diagnostics.emplace_back(response.reason);
         networkdRest_ = now + networkdPause;
         return;
     }
@@ -181,8 +182,8 @@ void LiveMachine::consultNetworkd(ClientFacts& clients) {
     }
     const auto parsed = parseNetworkdDescription(response.json);
     if (const auto* const reason = std::get_if<std::string_view>(&parsed)) {
-        clients.diagnostics.push_back("cannot use what systemd-networkd says: " +
-                                      std::string{*reason});
+        clients.diagnostics.emplace_back("cannot use what systemd-networkd says: " +
+                                         std::string{*reason});
         return;
     }
     addNetworkdDescription(std::get<std::vector<NetworkdAddress>>(parsed), clients);
@@ -231,10 +232,10 @@ ClientFacts LiveMachine::readClients() {
 }
 
 /// What was not there at the last reading may be gone at the next request.
-void LiveMachine::planAnotherTry(const std::vector<std::string>& diagnostics) {
-    const bool lasts =
-        std::all_of(diagnostics.begin(), diagnostics.end(),
-                    [&](const std::string& diagnostic) { return reported_.contains(diagnostic); });
+void LiveMachine::planAnotherTry(const std::vector<Diagnostic>& diagnostics) {
+    const bool lasts = std::all_of(
+        diagnostics.begin(), diagnostics.end(),
+        [&](const Diagnostic& diagnostic) { return reported_.contains(diagnostic.text); });
     troubled_ = !diagnostics.empty();
     troubleRest_ = surroundings_.uptime();
     if (lasts) {
@@ -244,13 +245,15 @@ void LiveMachine::planAnotherTry(const std::vector<std::string>& diagnostics) {
 
 /// Reports what the last reading did not report: what lasts is reported once, however
 /// often the machine is read.
-void LiveMachine::report(const std::vector<std::string>& diagnostics) {
-    for (const std::string& diagnostic : diagnostics) {
-        if (!reported_.contains(diagnostic)) {
-            surroundings_.report(diagnostic);
+void LiveMachine::report(const std::vector<Diagnostic>& diagnostics) {
+    std::unordered_set<std::string> told;
+    for (const Diagnostic& diagnostic : diagnostics) {
+        if (!reported_.contains(diagnostic.text)) {
+            surroundings_.report(diagnostic.text);
         }
+        told.insert(diagnostic.text);
     }
-    reported_ = {diagnostics.begin(), diagnostics.end()};
+    reported_ = std::move(told);
 }
 
 }  // namespace ZR::Live

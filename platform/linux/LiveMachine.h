@@ -59,8 +59,8 @@ class LiveMachine final : public SnapshotSource {
     void consultNetworkd(ClientFacts& clients);
     void watchProcesses(const ClientFacts& clients);
     [[nodiscard]] bool socketsChanged() const;
-    void planAnotherTry(const std::vector<std::string>& diagnostics);
-    void report(const std::vector<std::string>& diagnostics);
+    void planAnotherTry(const std::vector<Diagnostic>& diagnostics);
+    void report(const std::vector<Diagnostic>& diagnostics);
 
     Surroundings surroundings_;
     RtnetlinkReader reader_;

@@ -70,7 +70,7 @@ class Machine {
     [[nodiscard]] const std::optional<ServiceProcessor>& serviceProcessor() const {
         return facts_.serviceProcessor;
     }
-    [[nodiscard]] const std::vector<std::string>& diagnostics() const {
+    [[nodiscard]] const std::vector<Diagnostic>& diagnostics() const {
         return facts_.clients.diagnostics;
     }
 

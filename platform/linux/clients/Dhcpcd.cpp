@@ -84,7 +84,7 @@ class Reader {
                 return;
             }
         }
-        facts_.diagnostics.push_back("cannot use " + file.path + ": " + std::string{*reason});
+        facts_.diagnostics.emplace_back("cannot use " + file.path + ": " + std::string{*reason});
     }
 
   private:

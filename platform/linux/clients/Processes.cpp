@@ -179,9 +179,9 @@ void readClient(int proc, std::string_view process, const KnownClient& client,
     }
     const auto where = whereIs(proc, process, ownNamespace);
     if (where == ManagerProcess::Where::Unknown && (errno == EACCES || errno == EPERM)) {
-        facts.diagnostics.push_back("cannot tell the links of process " + std::string{process} +
-                                    " (" + std::string{nameOf(found->client)} +
-                                    "): " + reasonOf(errno));
+        facts.diagnostics.emplace_back("cannot tell the links of process " + std::string{process} +
+                                       " (" + std::string{nameOf(found->client)} +
+                                       "): " + reasonOf(errno));
     }
     if (where == ManagerProcess::Where::Here) {
         found->pid = numberOf(process);

@@ -104,7 +104,7 @@ std::vector<std::uint32_t> parsePacketLinks(std::string_view text) {
     return links;
 }
 
-ClientSockets readSockets(const Roots& roots, std::vector<std::string>& diagnostics) {
+ClientSockets readSockets(const Roots& roots, std::vector<Diagnostic>& diagnostics) {
     // Of this thread: namespaces belong to threads, not to processes.
     const std::string directory = roots.proc + "/thread-self/net";
     ClientSockets sockets;

@@ -8,6 +8,7 @@
 
 #include "formats/IpAddress.h"
 #include "formats/Roots.h"
+#include "zrclient/Diagnostic.h"
 
 namespace ZR::Live {
 
@@ -38,6 +39,6 @@ struct ClientSockets {
 /// The sockets of this network namespace. Any user may read them, also where the
 /// processes that have them are hidden. Packet sockets are looked at only where there is
 /// a bound one.
-[[nodiscard]] ClientSockets readSockets(const Roots& roots, std::vector<std::string>& diagnostics);
+[[nodiscard]] ClientSockets readSockets(const Roots& roots, std::vector<Diagnostic>& diagnostics);
 
 }  // namespace ZR::Live

@@ -74,17 +74,18 @@ TEST(Overview, IsJson) {
 )");
 }
 
-TEST(RemarkLine, IsOneLineOrNone) {
-    EXPECT_EQ(remarkLine({}), "");
-    const std::vector<std::string> remarks{"cannot read /a: Permission denied", "cannot read \nb"};
-    EXPECT_EQ(remarkLine(std::span{remarks}.first(1)),
+TEST(DiagnosticLine, IsOneLineOrNone) {
+    EXPECT_EQ(diagnosticLine({}), "");
+    const std::vector<ZR::Diagnostic> diagnostics{
+        ZR::Diagnostic{"cannot read /a: Permission denied"}, ZR::Diagnostic{"cannot read \nb"}};
+    EXPECT_EQ(diagnosticLine(std::span{diagnostics}.first(1)),
               "cimdhcp: not everything could be read: cannot read /a: Permission denied\n");
-    const std::string both = remarkLine(remarks);
+    const std::string both = diagnosticLine(diagnostics);
     EXPECT_EQ(both.find('\n'), both.size() - 1) << both;
     EXPECT_NE(both.find("Permission denied; cannot read"), std::string::npos) << both;
     EXPECT_EQ(
-        remarkLine(std::vector<std::string>{"a", "b", "c", "d", "e", "f"}),
-        "cimdhcp: not everything could be read: a; b; c; d; and 2 more, which are in the log\n");
+        diagnosticLine(std::vector(6, ZR::Diagnostic{"a"})),
+        "cimdhcp: not everything could be read: a; a; a; a; and 2 more, which are in the log\n");
 }
 
 TEST(Overview, WithoutHeadingsIsRowsAlone) {

@@ -13,6 +13,7 @@
 #include "LinuxSupport.h"
 #include "ScriptedTransport.h"
 #include "StateReaders.h"
+#include "kit/Diagnostics.h"
 #include "kit/HostNameFake.h"
 #include "zrcommon/SystemName.h"
 #include "zrlinux/LiveSource.h"
@@ -193,24 +194,25 @@ TEST_F(LiveMachineTest, WhatCannotBeReadIsARemark) {
     LiveMachine& machine =
         open({links(1), address(2, {192, 0, 2, 1}), links(1), address(2, {192, 0, 2, 1})});
     const auto tree = machine.read();
-    ASSERT_EQ(tree->remarks().size(), 1U);
-    EXPECT_THAT(tree->remarks()[0], HasSubstr("cannot read " + root_.path("/run/net-eth1.conf")));
+    ASSERT_EQ(tree->diagnostics().size(), 1U);
+    EXPECT_THAT(tree->diagnostics()[0].text,
+                HasSubstr("cannot read " + root_.path("/run/net-eth1.conf")));
     std::filesystem::remove_all(root_.path("/run/net-eth1.conf"));
     EXPECT_TRUE(machine.changed());
-    EXPECT_THAT(machine.read()->remarks(), IsEmpty());
+    EXPECT_THAT(ZR::Testing::textsOf(machine.read()->diagnostics()), IsEmpty());
 }
 
 TEST_F(LiveMachineTest, WhatCouldNotBeReadIsTriedAgain) {
     std::filesystem::create_directories(root_.path("/run/net-eth1.conf"));
     LiveMachine& machine = open({links(1), address(2, {192, 0, 2, 1}), links(1),
                                  address(2, {192, 0, 2, 1}), links(1), address(2, {192, 0, 2, 1})});
-    ASSERT_EQ(machine.read()->remarks().size(), 1U);
+    ASSERT_EQ(machine.read()->diagnostics().size(), 1U);
     EXPECT_TRUE(machine.changed()) << "it may be over already";
-    ASSERT_EQ(machine.read()->remarks().size(), 1U);
+    ASSERT_EQ(machine.read()->diagnostics().size(), 1U);
     EXPECT_FALSE(machine.changed()) << "it lasts";
     uptime_ += std::chrono::seconds{1};
     EXPECT_TRUE(machine.changed()) << "it may be over without a sign";
-    ASSERT_EQ(machine.read()->remarks().size(), 1U);
+    ASSERT_EQ(machine.read()->diagnostics().size(), 1U);
     EXPECT_FALSE(machine.changed());
     EXPECT_EQ(diagnostics_.size(), 1U);
 }
@@ -221,8 +223,9 @@ TEST_F(LiveMachineTest, WhatSeveralReadersCannotReadIsToldOnce) {
     std::filesystem::create_directories(root_.path("/var/lib"));
     std::filesystem::create_symlink(place, place);
     const auto tree = open({links(1), address(2, {192, 0, 2, 1})}).read();
-    EXPECT_THAT(tree->remarks(), testing::UnorderedElementsAre(HasSubstr("cannot read " + place),
-                                                               HasSubstr("cannot watch " + place)));
+    EXPECT_THAT(ZR::Testing::textsOf(tree->diagnostics()),
+                testing::UnorderedElementsAre(HasSubstr("cannot read " + place),
+                                              HasSubstr("cannot watch " + place)));
 }
 
 TEST_F(LiveMachineTest, TheComputerHasTheHostsName) {
@@ -241,7 +244,8 @@ TEST_F(LiveMachineTest, AMachineThatDoesNotTellItsNameShowsItsInterfaces) {
         EXPECT_THAT(interfaceNames(*tree), ElementsAre("eth1"));
         EXPECT_EQ(tree->node(0).description, "Computer");
         EXPECT_EQ(tree->find(0, Properties::Name)->value, PropertyValue{});
-        EXPECT_THAT(tree->remarks(), ElementsAre("the system does not tell its name: Bad address"));
+        EXPECT_THAT(ZR::Testing::textsOf(tree->diagnostics()),
+                    ElementsAre("the system does not tell its name: Bad address"));
         EXPECT_THAT(diagnostics_, ElementsAre("the system does not tell its name: Bad address"));
     }
     EXPECT_TRUE(machine.changed()) << "to be read again";
@@ -277,7 +281,7 @@ TEST_F(LiveMachineTest, AKernelThatDoesNotRespondHoldsNoCallerUp) {
     const auto tree = machine.read();
     EXPECT_THAT(interfaceNames(*tree), IsEmpty()) << "what was once read is not shown again";
     EXPECT_THAT(diagnostics_, ElementsAre(HasSubstr("network links: no response: ")));
-    EXPECT_THAT(tree->remarks(), testing::ElementsAreArray(diagnostics_));
+    EXPECT_THAT(ZR::Testing::textsOf(tree->diagnostics()), testing::ElementsAreArray(diagnostics_));
     EXPECT_TRUE(machine.changed()) << "to be read again";
 }
 

@@ -97,7 +97,14 @@ class TreeReader {
     bool null() { return unreadable(0); }
     bool boolean(bool value) { return scalar(PropertyValue(value), 0); }
     bool number_integer(std::int64_t /*value*/) { return unreadable(1); }  // a negative one
-    bool number_unsigned(std::uint64_t value) { return scalar(PropertyValue(value), 1); }
+    bool number_unsigned(std::uint64_t value) {
+        if (next() == Slot::propertyEntry) {
+            listIsReadable_ = listIsReadable_ && list_.empty();
+            numbers_.push_back(value);
+            return passed(1);
+        }
+        return scalar(PropertyValue(value), 1);
+    }
     bool number_float(double /*value*/, const std::string& /*text*/) { return unreadable(1); }
     bool binary(std::vector<std::uint8_t>& /*value*/) { return unreadable(0); }  // not in a text
 
@@ -113,7 +120,7 @@ class TreeReader {
                 set(isReadable(value) ? PropertyValue(expanded(value)) : PropertyValue());
                 break;
             case Slot::propertyEntry:
-                listIsReadable_ = listIsReadable_ && isReadable(value);
+                listIsReadable_ = listIsReadable_ && numbers_.empty() && isReadable(value);
                 list_.push_back(expanded(value));
                 break;
             case Slot::readOnlyEntry:
@@ -187,6 +194,7 @@ class TreeReader {
         switch (slot) {
             case Slot::property:
                 list_.clear();
+                numbers_.clear();
                 listIsReadable_ = true;
                 [[fallthrough]];
             case Slot::nodes:
@@ -208,7 +216,7 @@ class TreeReader {
         const bool isList = frames_.back().what == Slot::property;
         frames_.pop_back();
         if (isList) {
-            set(listIsReadable_ ? PropertyValue(std::exchange(list_, {})) : PropertyValue());
+            set(takeList());
         }
         return passed(0);
     }
@@ -294,6 +302,15 @@ class TreeReader {
         } else {
             properties.push_back({property_, false, std::move(value)});
         }
+    }
+
+    /// The list that was read: of texts, or of numbers; a mixed one cannot be read.
+    [[nodiscard]] PropertyValue takeList() {
+        if (!listIsReadable_) {
+            return {};
+        }
+        return numbers_.empty() ? PropertyValue(std::exchange(list_, {}))
+                                : PropertyValue(std::exchange(numbers_, {}));
     }
 
     /// Takes a value that is not a text, if any such may stand in the slot.
@@ -388,6 +405,7 @@ class TreeReader {
     Slot slot_ = Slot::ignored;
     NodeLexicon::Properties property_{};
     std::vector<std::string> list_;
+    std::vector<std::uint64_t> numbers_;
     bool listIsReadable_ = true;
     unsigned nodeDepth_ = 0;
     unsigned ignoredDepth_ = 0;

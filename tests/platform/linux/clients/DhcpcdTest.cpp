@@ -5,6 +5,7 @@
 #include <sys/socket.h>
 
 #include "LinuxSupport.h"
+#include "kit/Diagnostics.h"
 
 namespace ZR::Live {
 namespace {
@@ -114,7 +115,7 @@ TEST_F(DhcpcdTest, AllItsPlacesAreRead) {
     EXPECT_THAT(read().leases, ElementsAre(lease("/var/lib/dhcpcd/eth1.lease"),
                                            lease("/var/lib/dhcpcd5/dhcpcd-eth1.lease"),
                                            lease("/var/db/dhcpcd/eth1.lease")));
-    EXPECT_THAT(read().diagnostics, IsEmpty());
+    EXPECT_THAT(ZR::Testing::textsOf(read().diagnostics), IsEmpty());
 }
 
 TEST_F(DhcpcdTest, ARunningOneOfTheLinkOrOfAllKeepsTheLease) {
@@ -149,7 +150,7 @@ TEST_F(DhcpcdTest, AReplyWithoutALeaseTimeIsNotALease) {
         sample("dhcpcd-10/eth1.lease").substr(0, 240) + std::string{"\x35\x01\x05\xff"};
     write("/var/lib/dhcpcd/eth1.lease", inform);
     EXPECT_THAT(read().leases, IsEmpty());
-    EXPECT_THAT(read().diagnostics, IsEmpty());
+    EXPECT_THAT(ZR::Testing::textsOf(read().diagnostics), IsEmpty());
 }
 
 TEST_F(DhcpcdTest, AnEmptyFileIsJustBeingWritten) {
@@ -161,7 +162,7 @@ TEST_F(DhcpcdTest, AFileThatIsNotAPacketIsReported) {
     write("/var/lib/dhcpcd/eth1.lease", "text");
     write("/var/lib/dhcpcd/eth1.lease6", "text");
     EXPECT_THAT(read().leases, IsEmpty());
-    EXPECT_THAT(read().diagnostics,
+    EXPECT_THAT(ZR::Testing::textsOf(read().diagnostics),
                 ElementsAre("cannot use " + root_.path("/var/lib/dhcpcd/eth1.lease") +
                                 ": shorter than a DHCP message",
                             HasSubstr("not a reply of a server")));

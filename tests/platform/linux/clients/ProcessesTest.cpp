@@ -9,6 +9,7 @@
 
 #include "LinuxSupport.h"
 #include "kit/ChildProcess.h"
+#include "kit/Diagnostics.h"
 
 namespace ZR::Live {
 namespace {
@@ -61,7 +62,7 @@ TEST_F(ProcessesTest, ClientsOfOtherNamespacesConcernOtherLinks) {
 TEST_F(ProcessesTest, AClientOfAnUnknownNamespaceIsNotTrusted) {
     add("17", "dhclient", commandLine_, nullptr);
     EXPECT_THAT(read().processes, IsEmpty());
-    EXPECT_THAT(read().diagnostics, IsEmpty());
+    EXPECT_THAT(ZR::Testing::textsOf(read().diagnostics), IsEmpty());
 }
 
 TEST_F(ProcessesTest, WithoutAnOwnNamespaceNoClientIsTrusted) {
@@ -127,8 +128,8 @@ TEST_F(ProcessesTest, AClientWhoseNamespaceIsForbiddenIsReported) {
         }
         const ClientFacts facts = read();
         std::string text = std::to_string(facts.processes.size()) + " processes";
-        for (const std::string& diagnostic : facts.diagnostics) {
-            text += "; " + diagnostic;
+        for (const Diagnostic& diagnostic : facts.diagnostics) {
+            text += "; " + diagnostic.text;
         }
         return text;
     });
@@ -186,7 +187,7 @@ TEST_F(ProcessesTest, AnyListOfThreadsOfTheKernelIsRead) {
 TEST_F(ProcessesTest, WithoutAProcessFileSystemThereIsAReason) {
     ClientFacts facts;
     readProcesses({.files = "", .proc = proc_.path("/none")}, facts);
-    EXPECT_THAT(facts.diagnostics,
+    EXPECT_THAT(ZR::Testing::textsOf(facts.diagnostics),
                 ElementsAre("cannot read " + proc_.path("/none") + ": No such file or directory"));
 }
 

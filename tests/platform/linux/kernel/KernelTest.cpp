@@ -12,6 +12,7 @@
 
 #include "LinuxSupport.h"
 #include "LiveMachine.h"
+#include "kit/Diagnostics.h"
 #include "kit/Namespaces.h"
 #include "zrcommon/UniqueFd.h"
 #include "zrlinux/LiveSource.h"
@@ -58,7 +59,8 @@ TEST(Kernel, AMachineWithoutANameShowsItsInterfaces) {
         Watched machine;
         EXPECT_THAT(interfaceNames(machine.now()), ElementsAre("br0"));
         EXPECT_EQ(machine.now().find(0, Properties::Name)->value, PropertyValue{});
-        EXPECT_THAT(machine.now().remarks(), Contains("the system has no name"));
+        EXPECT_THAT(ZR::Testing::textsOf(machine.now().diagnostics()),
+                    Contains("the system has no name"));
     }));
 }
 

@@ -7,6 +7,7 @@
 #include <sys/socket.h>
 
 #include "LinuxSupport.h"
+#include "kit/Diagnostics.h"
 #include "kit/Namespaces.h"
 #include "zrcommon/UniqueFd.h"
 
@@ -48,16 +49,16 @@ TEST(PacketLinks, EachLinkOnceWhereIPv4IsHeard) {
 
 TEST(Sockets, WithoutAProcessFileSystemThereAreNone) {
     const TemporaryDirectory root;
-    std::vector<std::string> diagnostics;
+    std::vector<ZR::Diagnostic> diagnostics;
     EXPECT_EQ(readSockets({.files = root.path(), .proc = root.path("/proc")}, diagnostics),
               ClientSockets{});
-    EXPECT_THAT(diagnostics, IsEmpty());
+    EXPECT_THAT(ZR::Testing::textsOf(diagnostics), IsEmpty());
 }
 
 TEST(Sockets, OfARealKernel) {
     ZR_NEEDS_NAMESPACES();
     EXPECT_TRUE(passesInNamespaces(30, [] {
-        std::vector<std::string> diagnostics;
+        std::vector<ZR::Diagnostic> diagnostics;
         EXPECT_EQ(readSockets({}, diagnostics), ClientSockets{});
 
         run("ip link set lo up");
@@ -81,7 +82,7 @@ TEST(Sockets, OfARealKernel) {
         EXPECT_THAT(sockets.bound,
                     ElementsAre(PortSocket{.address = "127.0.0.1"_ip, .peer = "127.0.0.2"_ip}));
         EXPECT_THAT(sockets.packetLinks, IsEmpty()) << "it hears all links";
-        EXPECT_THAT(diagnostics, IsEmpty());
+        EXPECT_THAT(ZR::Testing::textsOf(diagnostics), IsEmpty());
     }));
 }
 
