@@ -3,11 +3,16 @@
 #include <algorithm>
 #include <utility>
 
+#include "cimom/MofError.h"
 #include "cimom/Names.h"
+#include "cimom/Results.h"
+#include "client/MachineInterfaces.h"
+#include "client/Response.h"
 #include "client/StatusMessage.h"
 #include "text/DisplayText.h"
 #include "zrclient/InstrumentationService.h"
 #include "zrcommon/PlatformUtilities.h"
+#include "zrlinux/LiveSource.h"
 
 namespace cimdhcp {
 
@@ -49,6 +54,14 @@ const cimom::ClassRepository& EmbeddedClient::repository() const noexcept {
 
 const std::vector<cimom::Registration>& EmbeddedClient::registrations() const noexcept {
     return manager_->registrations();
+}
+
+void EmbeddedClient::awaitServiceProcessor(std::chrono::seconds patience) {
+    if (!ZR::InstrumentationService::process().awaiting()) {
+        return;
+    }
+    static_cast<void>(enumerateNames(classPath("QVXZR_DHCPProtocolEndpoint")));
+    ZR::InstrumentationService(ZR::openLiveSource()).settle(patience);
 }
 
 std::vector<ClassEntry> EmbeddedClient::servedClasses() {

@@ -8,6 +8,7 @@
 #include <utility>
 #include <variant>
 
+#include "cimom/ClassDeclaration.h"
 #include "text/ValueMeaning.h"
 
 namespace cimdhcp {

@@ -4,10 +4,13 @@
 #include <string>
 #include <unordered_map>
 
-#include "cimxml/OperationRequest.h"
-#include "cimxml/OperationResponse.h"
 #include "client/Client.h"
 #include "client/HttpConnection.h"
+
+namespace cimom::wbem {
+class OperationRequest;
+struct OperationResponse;
+}  // namespace cimom::wbem
 
 namespace cimdhcp {
 
@@ -18,6 +21,9 @@ class RemoteClient : public Client {
   public:
     RemoteClient(const ServerUrl& url, HttpSettings settings, const Deadline& deadline,
                  std::string nameSpace);
+    ~RemoteClient() override;
+    RemoteClient(const RemoteClient&) = delete;
+    RemoteClient& operator=(const RemoteClient&) = delete;
 
     /// Each class is asked for once, when it is first needed.
     [[nodiscard]] ClassLookup classes() override;

@@ -12,7 +12,9 @@
 #include <variant>
 
 #include "arguments/Directories.h"
+#include "cimom/Instance.h"
 #include "client/EmbeddedClient.h"
+#include "client/Response.h"
 #include "commands/HiddenClients.h"
 #include "commands/PlatformSetup.h"
 #include "text/DisplayText.h"

@@ -4,6 +4,10 @@
 
 #include "arguments/PathArgument.h"
 #include "arguments/ValueReading.h"
+#include "cimom/ClassDeclaration.h"
+#include "cimom/Instance.h"
+#include "cimom/Requests.h"
+#include "client/Client.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
 

@@ -4,6 +4,8 @@
 #include <type_traits>
 #include <utility>
 
+#include "client/Client.h"
+#include "client/Response.h"
 #include "commands/CimOperations.h"
 #include "commands/ClassTable.h"
 #include "commands/Graph.h"

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <utility>
 
+#include "client/Client.h"
 #include "text/DisplayText.h"
 #include "text/JsonText.h"
 

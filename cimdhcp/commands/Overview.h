@@ -6,11 +6,13 @@
 #include <string>
 #include <vector>
 
-#include "client/Client.h"
+#include "client/MachineInterfaces.h"
 #include "text/Columns.h"
 #include "text/Style.h"
 
 namespace cimdhcp {
+
+class Client;
 
 /// Asks the provider for what it serves. Throws Failure for any response that is neither
 /// OK nor says that the class is not served.

@@ -13,6 +13,7 @@
 #include "client/Installation.h"
 #include "commands/Check.h"
 #include "commands/ClientCommands.h"
+#include "commands/Findings.h"
 #include "commands/PlatformSetup.h"
 #include "commands/RemoteRun.h"
 #include "commands/Serve.h"
@@ -32,22 +33,10 @@ namespace {
 /// How long the service processor may take.
 constexpr std::chrono::seconds patience(1);
 
-/// No request of the provider waits for the service processor, whose response comes later.
-/// This program ends after one request, and so waits: a first request makes the provider
-/// send its own to the service processor; a further one is sent after it, and its response
-/// awaited, which comes after the response to the provider.
-void awaitServiceProcessor(Client& client) {
-    if (!ZR::InstrumentationService::process().awaiting()) {
-        return;
-    }
-    static_cast<void>(client.enumerateNames(client.classPath("QVXZR_DHCPProtocolEndpoint")));
-    ZR::InstrumentationService(ZR::openLiveSource()).settle(patience);
-}
-
 std::unique_ptr<EmbeddedClient> openClient(const Options& options) {
     auto client = std::make_unique<EmbeddedClient>(
         findDirectories(options, installations(executableFile())), options.nameSpace);
-    awaitServiceProcessor(*client);
+    client->awaitServiceProcessor(patience);
     return client;
 }
 
@@ -72,7 +61,7 @@ class Execution {
 
     void operator()(const ServeCommand& command) const {
         const auto client = openClient(line_.options);
-        serve(command, *client, outputs_.out);
+        serve(command, client->manager(), outputs_.out);
     }
 
     void operator()(const CheckCommand& /*command*/) const {

@@ -3,6 +3,10 @@
 #include <utility>
 #include <vector>
 
+#include "cimom/Instance.h"
+#include "client/Client.h"
+#include "client/MachineInterfaces.h"
+#include "client/Response.h"
 #include "commands/RenameFiles.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
