@@ -17,12 +17,14 @@
 #include "commands/RemoteRun.h"
 #include "commands/Serve.h"
 #include "commands/UserAdd.h"
+#include "text/DisplayText.h"
 #include "text/Duration.h"
 #include "text/Failure.h"
 #include "text/Presentation.h"
 #include "zrclient/InstrumentationService.h"
 #include "zrclient/SnapshotJson.h"
 #include "zrcommon/PlatformSettings.h"
+#include "zrcommon/SystemName.h"
 #include "zrlinux/LiveSource.h"
 
 namespace cimdhcp {
@@ -67,7 +69,11 @@ class Execution {
             service.useSource(ZR::openLiveSource(ZR::Explain::Yes));
         }
         service.settle(patience);
-        outputs_.out << ZR::toJson(*service.current());
+        const auto snapshot = service.current();
+        outputs_.out << ZR::toJson(*snapshot, ZR::getSystemName());
+        for (const std::string& remark : snapshot->remarks()) {
+            outputs_.err << "cimdhcp: " << printable(remark) << '\n';
+        }
     }
 
     void operator()(const ServeCommand& command) const {

@@ -211,6 +211,25 @@ TEST_F(JsonTreeSourceTest, AFaultIsLoggedOnceWithItsPlace) {
                 ElementsAre(lines[0].message, EndsWith(path_ + ":1:1: \"nodes\" is missing")));
 }
 
+TEST_F(JsonTreeSourceTest, ASnapshotTellsWhyItsFileCannotBeUsed) {
+    JsonTreeSource source(path_, "my tree");
+    EXPECT_THAT(source.read()->remarks(), ElementsAre("my tree: No such file or directory"));
+    writeFile(path_, "{\"nodes\": [\n  {\"type\": 40}]}");
+    EXPECT_THAT(source.read()->remarks(), ElementsAre("my tree:2:12: \"type\" must be a text"));
+    EXPECT_THAT(log_.logMessages(), ElementsAre(EndsWith(path_ + ": No such file or directory"),
+                                                EndsWith(path_ + ":2:12: \"type\" must be a text")))
+        << "the log has the file's own name";
+}
+
+TEST_F(JsonTreeSourceTest, ASnapshotTellsOfSlipsInItsFileAndTheLogDoesNot) {
+    writeFile(path_, R"({"nodes": [{"type": "NetworkInterfaces"}]})");
+    JsonTreeSource source(path_);
+    const auto snapshot = source.read();
+    EXPECT_THAT(snapshot->nodes(), SizeIs(1));
+    EXPECT_THAT(snapshot->remarks(), ElementsAre(HasSubstr(path_ + ":1:21: the type ")));
+    EXPECT_THAT(log_.logMessages(), IsEmpty());
+}
+
 TEST_F(JsonTreeSourceTest, ADirectoryOrPipeInPlaceOfTheFileIsUnreadable) {
     ASSERT_TRUE(std::filesystem::create_directory(path_));
     use(path_);
