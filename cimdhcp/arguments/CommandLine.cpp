@@ -42,7 +42,7 @@ Examples:
 Exit status:
   0  done
   1  the response has a CIM status other than OK (its name is on standard error),
-     or a rename was not possible
+     a rename was not possible, or nothing was modified
   2  the command line cannot be understood
   3  the provider or a file cannot be loaded, a server cannot be reached or
      understood, or the output cannot be written
@@ -171,7 +171,8 @@ class CommandLineReader::Parser {
     }
 
     void addOptions() {
-        app_.add_option("--tree", line_.options.tree, "A JSON tree in place of the live machine")
+        app_.add_option("--tree", line_.options.tree,
+                        "A JSON tree (-: stdin) in place of the live machine")
             ->type_name("FILE");
         app_.add_option("--data-dir", line_.options.dataDir,
                         "Directory of the ifcfg-INTERFACE files")
@@ -232,6 +233,8 @@ class CommandLineReader::Parser {
         rename->add_option("NAME", records_.rename.name, "The new configuration name")->required();
         rename->add_flag("--create", records_.rename.create,
                          "Make the interface's configuration file if there is none");
+        rename->add_flag("--force", records_.rename.force,
+                         "Change the file even if that does harm to it, or to its readers");
         CLI::App* const graph = command("graph", machineGroup,
                                         "Instances and associations, for Graphviz", records_.graph);
         graph->add_flag("--svg", records_.graph.svg, "Draw it as SVG (needs the package graphviz)");

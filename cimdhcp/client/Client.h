@@ -45,8 +45,10 @@ class Client {
     virtual Response enumerateNames(const cimom::ObjectPath& path) = 0;
     virtual Response enumerate(const cimom::ObjectPath& path) = 0;
     virtual Response get(const cimom::ObjectPath& path) = 0;
-    /// Changes the properties that the instance has, and no others.
-    virtual Response modify(const cimom::Instance& instance) = 0;
+    /// Changes the properties that are named, to what the instance has for them. Providers
+    /// that do not look at the names should find the others as they are in the instance.
+    virtual Response modify(const cimom::Instance& instance,
+                            const std::vector<std::string>& properties) = 0;
     virtual Response associatorNames(const cimom::ObjectPath& path,
                                      const cimom::AssociationRequest& request) = 0;
     virtual Response associators(const cimom::ObjectPath& path,

@@ -98,12 +98,10 @@ Response EmbeddedClient::get(const cimom::ObjectPath& path) {
     return responseOf("GetInstance", manager_->getInstance(path));
 }
 
-Response EmbeddedClient::modify(const cimom::Instance& instance) {
+Response EmbeddedClient::modify(const cimom::Instance& instance,
+                                const std::vector<std::string>& properties) {
     cimom::InstanceRequest request;
-    request.propertyList.emplace();
-    for (const cimom::NamedValue& property : instance.properties) {
-        request.propertyList->push_back(property.name);
-    }
+    request.propertyList = properties;
     return responseOf("ModifyInstance", manager_->modifyInstance(instance, request));
 }
 

@@ -37,7 +37,8 @@ class EmbeddedClient : public Client {
     Response enumerateNames(const cimom::ObjectPath& path) override;
     Response enumerate(const cimom::ObjectPath& path) override;
     Response get(const cimom::ObjectPath& path) override;
-    Response modify(const cimom::Instance& instance) override;
+    Response modify(const cimom::Instance& instance,
+                    const std::vector<std::string>& properties) override;
     Response associatorNames(const cimom::ObjectPath& path,
                              const cimom::AssociationRequest& request) override;
     Response associators(const cimom::ObjectPath& path,

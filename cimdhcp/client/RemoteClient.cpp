@@ -230,15 +230,12 @@ Response RemoteClient::get(const cimom::ObjectPath& path) {
     return response;
 }
 
-Response RemoteClient::modify(const cimom::Instance& instance) {
-    std::vector<std::string> names;
-    for (const cimom::NamedValue& property : instance.properties) {
-        names.push_back(property.name);
-    }
+Response RemoteClient::modify(const cimom::Instance& instance,
+                              const std::vector<std::string>& properties) {
     OperationRequest request("ModifyInstance", instance.path.nameSpace);
     request.namedInstance("ModifiedInstance", instance)
         .flag("IncludeQualifiers", false)
-        .texts("PropertyList", names);
+        .texts("PropertyList", properties);
     return instancesOf(request);
 }
 

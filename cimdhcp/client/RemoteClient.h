@@ -3,6 +3,7 @@
 #include <memory>
 #include <string>
 #include <unordered_map>
+#include <vector>
 
 #include "client/Client.h"
 #include "client/HttpConnection.h"
@@ -39,7 +40,8 @@ class RemoteClient : public Client {
     Response enumerateNames(const cimom::ObjectPath& path) override;
     Response enumerate(const cimom::ObjectPath& path) override;
     Response get(const cimom::ObjectPath& path) override;
-    Response modify(const cimom::Instance& instance) override;
+    Response modify(const cimom::Instance& instance,
+                    const std::vector<std::string>& properties) override;
     Response associatorNames(const cimom::ObjectPath& path,
                              const cimom::AssociationRequest& request) override;
     Response associators(const cimom::ObjectPath& path,

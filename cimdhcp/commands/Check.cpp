@@ -15,12 +15,12 @@
 #include "cimom/Instance.h"
 #include "client/EmbeddedClient.h"
 #include "client/Response.h"
+#include "commands/DataDirectory.h"
 #include "commands/HiddenClients.h"
 #include "commands/PlatformSetup.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
 #include "zrclient/InstrumentationService.h"
-#include "zrcommon/InterfaceFile.h"
 #include "zrcommon/PlatformSettings.h"
 
 namespace cimdhcp {
@@ -40,7 +40,7 @@ class Examination {
 
     std::vector<Finding> examine() {
         const bool machine = lookAtSettings();
-        lookAtDataDirectory();
+        lookAtDataDirectory(ZR::PlatformSettings::process().dataDir, findings_);
         if (machine) {
             lookAtMachine();
         }
@@ -88,35 +88,8 @@ class Examination {
         return !failure;
     }
 
-    void lookAtDataDirectory() {
-        const std::string& directory = ZR::PlatformSettings::process().dataDir;
-        std::error_code error;
-        if (!fs::is_directory(directory, error)) {
-            add(Verdict::notable, "data directory",
-                directory + " does not exist: no configuration has a name, and none can be given",
-                "mkdir -p " + directory + ", or set DATA_DIR");
-            return;
-        }
-        std::size_t files = 0;
-        for (fs::directory_iterator entry(directory, error); !error && entry != end(entry);
-             entry.increment(error)) {
-            if (entry->path().filename().string().starts_with(ZR::InterfaceFile::prefix)) {
-                ++files;
-            }
-        }
-        if (error) {
-            add(Verdict::bad, "data directory", directory + ": " + error.message(),
-                "let this user read it, or run as another one");
-            return;
-        }
-        const bool writable = ::access(directory.c_str(), W_OK) == 0;
-        add(Verdict::good, "data directory",
-            directory + " has " + counted(files, "ifcfg file", "ifcfg files") +
-                (writable ? "" : "; this user may not write there, and so not rename"));
-    }
-
     void lookAtMachine() {
-        const std::string& tree = ZR::PlatformSettings::process().instrumentationTree;
+        const std::string& tree = treeName();
         if (tree.empty()) {
             lookAtLiveSources();
         }

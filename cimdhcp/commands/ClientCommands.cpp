@@ -43,7 +43,8 @@ class Execution {
 
     Outcome operator()(const RenameCommand& command) const {
         const RenameReport report = rename(command, client_);
-        return {presentation_.json() ? renameJson(report) : renameText(report), "", std::nullopt};
+        return {presentation_.json() ? renameJson(report) : renameText(report),
+                renameRemarks(command, report), std::nullopt};
     }
 
     Outcome operator()(const GraphCommand& command) const {

@@ -18,12 +18,14 @@
 #include "commands/RemoteRun.h"
 #include "commands/Serve.h"
 #include "commands/UserAdd.h"
+#include "text/DisplayText.h"
 #include "text/Duration.h"
 #include "text/Failure.h"
 #include "text/Presentation.h"
 #include "zrclient/InstrumentationService.h"
 #include "zrclient/SnapshotJson.h"
 #include "zrcommon/PlatformSettings.h"
+#include "zrcommon/SystemName.h"
 #include "zrlinux/LiveSource.h"
 
 namespace cimdhcp {
@@ -56,7 +58,11 @@ class Execution {
             service.useSource(ZR::openLiveSource(ZR::Explain::Yes));
         }
         service.settle(patience);
-        outputs_.out << ZR::toJson(*service.current());
+        const auto snapshot = service.current();
+        outputs_.out << ZR::toJson(*snapshot, ZR::getSystemName());
+        for (const ZR::Diagnostic& diagnostic : snapshot->diagnostics()) {
+            outputs_.err << "cimdhcp: " << printable(diagnostic.text) << '\n';
+        }
     }
 
     void operator()(const ServeCommand& command) const {

@@ -80,6 +80,18 @@ TEST_F(Check, TellsOfAMissingDataDirectory) {
     EXPECT_THAT(ended.out, HasSubstr("-> mkdir -p " + dataDir()));
 }
 
+TEST_F(Check, WarnsOfADataDirectoryWhoseFilesShellsRead) {
+    const std::string link = directory() / "link";
+    fs::create_symlink("/etc/default", link);
+    for (const std::string& path : {std::string("/etc/default"), link}) {
+        const Ended ended = runAs(program(), {"--tree", tree(), "--data-dir", path, "check"});
+        EXPECT_EQ(ended.status, 0);
+        EXPECT_THAT(ended.out,
+                    HasSubstr("note  data directory: " + path +
+                              "/ is in /etc/default, whose files shells or network scripts read"));
+    }
+}
+
 TEST_F(Check, TellsOfAMissingLibrary) {
     const Ended ended = check({"--provider-dir", emptyDirectory()});
     EXPECT_EQ(ended.status, 1);

@@ -1,5 +1,6 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <unistd.h>
 
 #include <nlohmann/json.hpp>
 
@@ -134,11 +135,54 @@ TEST_F(OverviewCommands, TreePrintsAJsonTreeThatCanBeReadBack) {
     EXPECT_EQ(first.status, 0);
     EXPECT_EQ(first.err, "");
     const auto json = nlohmann::json::parse(first.out);
-    EXPECT_EQ(json["nodes"][0]["properties"]["Name"], hostName());
+    EXPECT_EQ(json["nodes"][0]["properties"]["Name"], "${HOSTNAME}") << "whole on any machine";
     EXPECT_EQ(json["nodes"][0]["children"][0]["children"][0]["properties"]["DHCPServerAddresses"],
               nlohmann::json({"192.0.2.1", "2001:db8::1"}));
     ZR::Testing::writeFile(tree(), first.out);
     EXPECT_EQ(run({"tree"}), first);
+}
+
+TEST_F(OverviewCommands, ATreeOfThisMachineIsWholeOnAnother) {
+    if (::geteuid() != 0) {
+        GTEST_SKIP() << "needs root, to be another machine";
+    }
+    ZR::Testing::writeFile(tree(), run({"tree"}).out);
+    // With the instances of a machine of that name.
+    EXPECT_EQ(runAs("/usr/bin/unshare",
+                    {"--uts", "/bin/sh", "-c",
+                     "hostname elsewhere && " + program() + " --tree " + tree() + " --data-dir " +
+                         dataDir() + " names --count QVXZR_HostedDHCPPoint"}),
+              (Ended{0, "1\n", ""}));
+}
+
+TEST_F(OverviewCommands, ATreeOfAnotherMachineIsToldByShowAndTree) {
+    std::string other = ZR::Testing::readFile(tree());
+    other.replace(other.find("${HOSTNAME}"), 11, "elsewhere");
+    ZR::Testing::writeFile(tree(), other);
+    const std::string told =
+        tree() + ":2:82: the computer is called \"elsewhere\" and this machine \"" + hostName() +
+        "\", which the instances of its interfaces name as their system: QVXZR_HostedDHCPPoint "
+        "and QVXZR_DHCPRemoteHostedAccessPoint have no instance for it; \"${HOSTNAME}\" stands "
+        "for the name of any machine\n";
+    EXPECT_THAT(run({"show"}).err, testing::EndsWith(told));
+    const Ended shown = run({"tree"});
+    EXPECT_EQ(shown.err, "cimdhcp: " + told);
+    EXPECT_EQ(nlohmann::json::parse(shown.out)["nodes"][0]["properties"]["Name"], "elsewhere");
+    // And so it is.
+    for (const char* association : {"QVXZR_HostedDHCPPoint", "QVXZR_DHCPRemoteHostedAccessPoint"}) {
+        EXPECT_EQ(run({"names", "--count", association}), (Ended{0, "0\n", ""}));
+    }
+    EXPECT_EQ(run({"names", "--count", "QVXZR_SAPSAPDependency"}), (Ended{0, "1\n", ""}));
+}
+
+TEST_F(OverviewCommands, SlipsInATreeAreToldWithTheirPlaces) {
+    setTree(test::computer("Computer", "\n" + test::dhcpInterface("eth0", "nowhere") + ",\n" +
+                                           test::dhcpInterface("eth0", "192.0.2.1")));
+    EXPECT_EQ(run({"tree"}).err,
+              "cimdhcp: " + tree() +
+                  ":2:184: \"nowhere\" is not an IP address\ncimdhcp: " + tree() +
+                  ":3:90: there is an interface \"eth0\" already: the instances of both "
+                  "have the same keys\n");
 }
 
 TEST_F(OverviewCommands, AnExplainedTreeSaysWhereEachPropertyOfTheLiveMachineCameFrom) {

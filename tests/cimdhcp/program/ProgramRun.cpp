@@ -226,7 +226,8 @@ std::string dhcpInterface(const std::string& name, const std::string& server) {
 
 std::string computer(const std::string& description, const std::string& interfaces) {
     return R"({"type": "ComputerSystem", "description": ")" + description +
-           R"(", "properties": {"Name": ")" + description +
+           R"(", "properties": {"Name": ")" +
+           (description == "Computer" ? "${HOSTNAME}" : description) +
            R"("}, "children": [{"type": "Network", "description": "Network", "children": [)" +
            interfaces + "]}]}";
 }
