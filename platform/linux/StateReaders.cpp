@@ -51,10 +51,6 @@ constexpr std::array ifupdownPlaces{StatePlace{ifupdownDirectory, ifupdownFile},
 constexpr std::array ifcfgPlaces{StatePlace{ifcfgDirectories[0], ifcfgPrefix},
                                  StatePlace{ifcfgDirectories[1], ifcfgPrefix}};
 
-void addSockets(const Roots& roots, ClientFacts& facts) {
-    facts.sockets = readSockets(roots, facts.diagnostics);
-}
-
 // Managers before the clients that they may start, and those before what is left of
 // the boot. The files of /proc cannot be watched.
 constexpr std::array readers{
@@ -71,10 +67,14 @@ constexpr std::array readers{
     StateReader{readNetplan, netplanPlaces},
     StateReader{readIfupdown, ifupdownPlaces},
     StateReader{readIfcfg, ifcfgPlaces},
-    StateReader{addSockets, {}},
+    StateReader{readClientSockets, {}},
 };
 
 }  // namespace
+
+void readClientSockets(const Roots& roots, ClientFacts& facts) {
+    facts.sockets = readSockets(roots, facts.diagnostics);
+}
 
 std::span<const StateReader> stateReaders() noexcept {
     return readers;
