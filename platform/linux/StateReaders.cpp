@@ -1,6 +1,9 @@
 #include "StateReaders.h"
 
+#include <sys/types.h>
+
 #include <array>
+#include <vector>
 
 #include "clients/Connman.h"
 #include "clients/Dhclient.h"
@@ -52,7 +55,16 @@ constexpr std::array ifcfgPlaces{StatePlace{ifcfgDirectories[0], ifcfgPrefix},
                                  StatePlace{ifcfgDirectories[1], ifcfgPrefix}};
 
 void addSockets(const Roots& roots, ClientFacts& facts) {
-    facts.sockets = readSockets(roots, facts.diagnostics);
+    std::vector<uid_t> users;
+    for (const ClientProcess& process : facts.processes) {
+        users.push_back(process.user);
+    }
+    for (const ManagerProcess& manager : facts.managers) {
+        if (manager.where != ManagerProcess::Where::Elsewhere) {
+            users.push_back(manager.user);
+        }
+    }
+    facts.sockets = readSockets(roots, facts.diagnostics, users);
 }
 
 // Managers before the clients that they may start, and those before what is left of
