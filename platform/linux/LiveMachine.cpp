@@ -233,10 +233,15 @@ ClientFacts LiveMachine::readClients() {
 
 /// What was not there at the last reading may be gone at the next request.
 void LiveMachine::planAnotherTry(const std::vector<Diagnostic>& diagnostics) {
+    const auto mayEnd = [](const Diagnostic& diagnostic) {
+        return diagnostic.kind == Diagnostic::Kind::Unreadable ||
+               diagnostic.kind == Diagnostic::Kind::Denied ||
+               diagnostic.kind == Diagnostic::Kind::Untrusted;
+    };
     const bool lasts = std::all_of(
         diagnostics.begin(), diagnostics.end(),
         [&](const Diagnostic& diagnostic) { return reported_.contains(diagnostic.text); });
-    troubled_ = !diagnostics.empty();
+    troubled_ = std::any_of(diagnostics.begin(), diagnostics.end(), mayEnd);
     troubleRest_ = surroundings_.uptime();
     if (lasts) {
         troubleRest_ += troublePause;
