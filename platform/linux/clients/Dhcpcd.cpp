@@ -211,8 +211,6 @@ class Daemon {
         readConfiguration();
     }
 
-    [[nodiscard]] std::int32_t pid() const noexcept { return process_.pid; }
-
     /// Adds what it does, and what it was told.
     void addTo(const LeaseFiles& files) {
         ClientProcess asks4 = process_;
@@ -256,32 +254,11 @@ class Daemon {
         const std::string line = ofProcess(pid, "cmdline");
         return parseDhcpcdTitle(std::string_view{line}.substr(0, line.find('\0')));
     }
-    [[nodiscard]] std::int32_t parentOf(std::int32_t pid) const {
-        constexpr std::string_view key = "\nPPid:\t";
-        const std::string status = ofProcess(pid, "status");
-        const std::size_t found = status.find(key);
-        if (found == std::string::npos) {
-            return 0;
-        }
-        const std::size_t begin = found + key.size();
-        return parseNumber<std::int32_t>(
-                   std::string_view{status}.substr(begin, status.find('\n', begin) - begin))
-            .value_or(0);
-    }
-
     void readSelf() {
         if (process_.pid == 0) {
             return;
         }
-        auto title = titleOf(process_.pid);
-        if (title && title->role == Role::Proxy) {
-            const std::int32_t parent = parentOf(process_.pid);
-            const auto ofParent = parent == 0 ? std::nullopt : titleOf(parent);
-            if (ofParent && ofParent->role == Role::Main) {
-                title = ofParent;
-                process_.pid = parent;
-            }
-        }
+        const auto title = titleOf(process_.pid);
         if (title) {
             ipv4_ = title->ipv4 || !title->ipv6;
             ipv6_ = title->ipv6 || !title->ipv4;
@@ -476,13 +453,11 @@ void replaceProcesses(const Roots& roots, const LeaseFiles& files, ClientFacts& 
     std::vector<ClientProcess> found(std::make_move_iterator(first),
                                      std::make_move_iterator(facts.processes.end()));
     facts.processes.erase(first, facts.processes.end());
-    std::vector<std::int32_t> met;
     for (ClientProcess& process : found) {
-        Daemon daemon{roots, std::move(process), facts};
-        if (daemon.pid() == 0 || !contains(met, daemon.pid())) {
-            met.push_back(daemon.pid());
-            daemon.addTo(files);
-        }
+        // Its sockets are known to have an owner, on whatever links it asks.
+        facts.managers.push_back(
+            {.client = Client::Dhcpcd, .where = ManagerProcess::Where::Here, .pid = process.pid});
+        Daemon{roots, std::move(process), facts}.addTo(files);
     }
 }
 
@@ -494,7 +469,7 @@ std::optional<ClientProcess> parseDhcpcdArguments(std::span<const std::string_vi
     }
     ClientProcess process{.client = Client::Dhcpcd, .interfaces = {}, .leaseFile = {}};
     if (const auto title = parseDhcpcdTitle(arguments.front())) {
-        if (title->role != Role::Main && title->role != Role::Proxy) {
+        if (title->role != Role::Main) {
             return std::nullopt;
         }
         if (title->interface) {

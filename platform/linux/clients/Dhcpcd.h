@@ -27,10 +27,8 @@ inline constexpr std::string_view dhcpcdConfigurationDirectory = "/etc";
 inline constexpr std::string_view dhcpcdConfigurationFile = "dhcpcd.conf";
 
 /// What a command line says, program name included. A running dhcpcd writes what it
-/// does in its place, "dhcpcd: eth1 [ip4] [ip6]", which is understood too. Since version 9
-/// the process that decides has no rights, so that its proxy, which has those of root,
-/// stands for it as well. nullopt for the other helpers, for one that runs only to speak to
-/// another, and for none at all.
+/// does in its place, "dhcpcd: eth1 [ip4] [ip6]", which is understood too. nullopt for
+/// its helpers, for one that runs only to speak to another, and for none at all.
 [[nodiscard]] std::optional<ClientProcess> parseDhcpcdArguments(
     std::span<const std::string_view> arguments);
 
@@ -41,7 +39,8 @@ inline constexpr std::string_view dhcpcdConfigurationFile = "dhcpcd.conf";
 /// Adds the leases of all known places, and puts in the place of the processes of dhcpcd
 /// that are in the facts what they really do: one for each protocol, with the links on
 /// which it asks or has leases. Its file, its command line, and the titles of its helpers
-/// tell that a link is left alone, or has an address that dhcpcd was told.
+/// tell that a link is left alone, or has an address that dhcpcd was told. Each dhcpcd that
+/// runs is a manager in the facts besides.
 void readDhcpcd(const Roots& roots, ClientFacts& facts);
 
 }  // namespace ZR::Live

@@ -79,8 +79,6 @@ DhcpcdTitle helperTitle(Role role, std::string_view rest) {
         title.address = IpAddress::ipv4FromText(nextWord(rest));
         return title;
     }
-    title.ipv4 = role == Role::Proxy && rest.find("[ip4]") != std::string_view::npos;
-    title.ipv6 = role == Role::Proxy && rest.find("[ip6]") != std::string_view::npos;
     title.interface = nameIn(nextWord(rest));
     if (role == Role::Defends) {
         title.address = IpAddress::ipv4FromText(nextWord(rest));

@@ -28,7 +28,7 @@ struct DhcpcdTitle {
     Role role = Role::Other;
     std::optional<InterfaceName> interface {};  ///< nullopt for all links
     std::optional<IpAddress> address{};         ///< of IPv4, that it defends or listens at
-    bool ipv4 = false;                          ///< of main and proxy
+    bool ipv4 = false;                          ///< of the main one
     bool ipv6 = false;                          ///< likewise
 
     bool operator==(const DhcpcdTitle&) const = default;

@@ -33,17 +33,11 @@ TEST(DhcpcdArguments, ARunningOneSaysWhatItDoes) {
 
 TEST(DhcpcdArguments, ItsHelpersAreNotClients) {
     for (const char* title :
-         {"dhcpcd: [network proxy] 198.51.100.7", "dhcpcd: [control proxy] eth1 [ip4]",
-          "dhcpcd: [BPF ARP] eth1 198.51.100.107", "dhcpcd: [BPF BOOTP] eth1", "dhcpcd: [launcher]",
-          "dhcpcd: "}) {
+         {"dhcpcd: [privileged proxy] eth1 [ip4] [ip6]", "dhcpcd: [network proxy] 198.51.100.7",
+          "dhcpcd: [control proxy] eth1 [ip4]", "dhcpcd: [BPF ARP] eth1 198.51.100.107",
+          "dhcpcd: [BPF BOOTP] eth1", "dhcpcd: [launcher]", "dhcpcd: "}) {
         EXPECT_EQ(parse({title}), std::nullopt) << title;
     }
-}
-
-TEST(DhcpcdArguments, TheProxyThatHasTheRightsStandsForIt) {
-    EXPECT_EQ(parse({"dhcpcd: [privileged proxy] eth1 [ip4]"}), process({"eth1"_name}));
-    EXPECT_EQ(parse({"dhcpcd: [privileged proxy] eth1 [ip6]"}), process({"eth1"_name}, true));
-    EXPECT_EQ(parse({"dhcpcd: [privileged proxy]"}), process({}));
 }
 
 TEST(DhcpcdArguments, BeforeItSaysSoItsArgumentsTell) {
@@ -289,14 +283,11 @@ TEST_F(RunningDhcpcdTest, OneOfAllLinksHasThoseWhereItAsksOrHasLeases) {
     EXPECT_TRUE(ofAll().leases.at(0).clientAlive);
 }
 
-TEST_F(RunningDhcpcdTest, TheProxyAloneIsEnoughToFindIt) {
-    run("eth1 [ip4]");
-    ClientProcess proxy = process({"eth1"_name});
-    proxy.pid = 8;
-    ClientProcess main = proxy;
-    main.pid = 7;
-    EXPECT_EQ(protocols(read({proxy})), "4");
-    EXPECT_EQ(protocols(read({main, proxy})), "4");
+TEST_F(RunningDhcpcdTest, WhatIsLeftOfItWhenItAsksNowhereIsAManager) {
+    run("[manager] [ip4] [ip6]");
+    EXPECT_THAT(ofAll().managers,
+                ElementsAre(ManagerProcess{
+                    .client = Client::Dhcpcd, .where = ManagerProcess::Where::Here, .pid = 7}));
 }
 
 TEST_F(RunningDhcpcdTest, AnAddressThatNoServerGaveItWasTold) {
