@@ -327,9 +327,7 @@ MachineInterfaces RemoteClient::interfaces(const ServedInstances& served) {
     for (const auto& path : systems.paths) {
         processors.push_back(heldText(path->key("Name")));
     }
-    return {interfacesOf(served.settings ? *served.settings : nothing,
-                         endpoints ? *endpoints : nothing, processors),
-            {}};
+    return {interfacesOf(served.settings ? *served.settings : nothing, endpoints, processors), {}};
 }
 
 std::optional<std::string> RemoteClient::dataDir() const {

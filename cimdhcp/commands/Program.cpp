@@ -71,7 +71,8 @@ class Execution {
     }
 
     void operator()(const CheckCommand& /*command*/) const {
-        const auto findings = check(line_.options, installations(executableFile()));
+        const auto findings =
+            check(line_.options, installations(executableFile()), presentation_.now);
         outputs_.out << (presentation_.json() ? findingsJson(findings) : findingsText(findings));
         if (!isGood(findings)) {
             throw Failure(ExitStatus::notDone, "something is wrong; see the list");
@@ -99,6 +100,11 @@ class Execution {
     const Outputs& outputs_;
 };
 
+std::int64_t secondsNow() {
+    const auto now = std::chrono::system_clock::now().time_since_epoch();
+    return std::chrono::floor<std::chrono::seconds>(now).count();
+}
+
 Style styleFor(const Options& options, bool terminal) {
     return {!options.noHeader,
             wantsColor(options.color, terminal, std::getenv("NO_COLOR"), std::getenv("TERM"))};
@@ -114,6 +120,7 @@ Presentation presentationOf(const CommandLine& line, const Outputs& outputs) {
     presentation.count = options.count;
     presentation.comments =
         options.format == Format::mof || std::holds_alternative<GraphCommand>(line.command);
+    presentation.now = secondsNow();
     return presentation;
 }
 
