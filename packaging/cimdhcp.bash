@@ -80,7 +80,7 @@ _cimdhcp() {
 
     if [[ $word == -* ]]; then
         case $command in
-            rename) options+=' --create' ;;
+            rename) options+=' --create --force' ;;
             graph) options+=' --svg' ;;
             tree) options+=' --explain' ;;
             serve) options+=' --listen --tls-cert --tls-key --users --read-only --max-header-line

@@ -50,6 +50,7 @@ struct RenameCommand {
     std::string interfaceName;
     std::string name;
     bool create = false;
+    bool force = false;  ///< whatever it does to the file
 
     bool operator==(const RenameCommand&) const = default;
 };

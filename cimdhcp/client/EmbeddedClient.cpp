@@ -3,11 +3,16 @@
 #include <algorithm>
 #include <utility>
 
+#include "cimom/MofError.h"
 #include "cimom/Names.h"
+#include "cimom/Results.h"
+#include "client/MachineInterfaces.h"
+#include "client/Response.h"
 #include "client/StatusMessage.h"
 #include "text/DisplayText.h"
 #include "zrclient/InstrumentationService.h"
 #include "zrcommon/PlatformUtilities.h"
+#include "zrlinux/LiveSource.h"
 
 namespace cimdhcp {
 
@@ -51,6 +56,14 @@ const std::vector<cimom::Registration>& EmbeddedClient::registrations() const no
     return manager_->registrations();
 }
 
+void EmbeddedClient::awaitServiceProcessor(std::chrono::seconds patience) {
+    if (!ZR::InstrumentationService::process().awaiting()) {
+        return;
+    }
+    static_cast<void>(enumerateNames(classPath("QVXZR_DHCPProtocolEndpoint")));
+    ZR::InstrumentationService(ZR::openLiveSource()).settle(patience);
+}
+
 std::vector<ClassEntry> EmbeddedClient::servedClasses() {
     return cimdhcp::servedClasses(registrations(), repository());
 }
@@ -85,12 +98,10 @@ Response EmbeddedClient::get(const cimom::ObjectPath& path) {
     return responseOf("GetInstance", manager_->getInstance(path));
 }
 
-Response EmbeddedClient::modify(const cimom::Instance& instance) {
+Response EmbeddedClient::modify(const cimom::Instance& instance,
+                                const std::vector<std::string>& properties) {
     cimom::InstanceRequest request;
-    request.propertyList.emplace();
-    for (const cimom::NamedValue& property : instance.properties) {
-        request.propertyList->push_back(property.name);
-    }
+    request.propertyList = properties;
     return responseOf("ModifyInstance", manager_->modifyInstance(instance, request));
 }
 

@@ -1,9 +1,11 @@
 #pragma once
 
+#include <chrono>
 #include <memory>
 #include <string>
 #include <vector>
 
+#include "cimom/ObjectManager.h"
 #include "client/Client.h"
 #include "client/Installation.h"
 
@@ -19,6 +21,12 @@ class EmbeddedClient : public Client {
     [[nodiscard]] const std::vector<cimom::Registration>& registrations() const noexcept;
     [[nodiscard]] cimom::ObjectManager& manager() noexcept { return *manager_; }
 
+    /// No request of the provider waits for the service processor, whose response comes later.
+    /// A program that ends after one request waits so long at most: a first request makes the
+    /// provider send its own to the service processor; a further one is sent after it, and its
+    /// response awaited, which comes after the response to the provider.
+    void awaitServiceProcessor(std::chrono::seconds patience);
+
     [[nodiscard]] ClassLookup classes() override { return repository(); }
     [[nodiscard]] std::vector<ClassEntry> servedClasses() override;
     [[nodiscard]] bool mayServe(std::string_view className) const override;
@@ -29,7 +37,8 @@ class EmbeddedClient : public Client {
     Response enumerateNames(const cimom::ObjectPath& path) override;
     Response enumerate(const cimom::ObjectPath& path) override;
     Response get(const cimom::ObjectPath& path) override;
-    Response modify(const cimom::Instance& instance) override;
+    Response modify(const cimom::Instance& instance,
+                    const std::vector<std::string>& properties) override;
     Response associatorNames(const cimom::ObjectPath& path,
                              const cimom::AssociationRequest& request) override;
     Response associators(const cimom::ObjectPath& path,

@@ -4,10 +4,16 @@
 #include <unordered_set>
 #include <utility>
 
+#include "cimom/ClassDeclaration.h"
 #include "cimom/Names.h"
+#include "cimom/Requests.h"
 #include "cimxml/ClassReader.h"
 #include "cimxml/Errors.h"
 #include "cimxml/HttpStatus.h"
+#include "cimxml/OperationRequest.h"
+#include "cimxml/OperationResponse.h"
+#include "client/MachineInterfaces.h"
+#include "client/Response.h"
 #include "client/StatusMessage.h"
 #include "text/DisplayText.h"
 #include "text/ValueMeaning.h"
@@ -142,6 +148,8 @@ RemoteClient::RemoteClient(const ServerUrl& url, HttpSettings settings, const De
                            std::string nameSpace)
     : Client(std::move(nameSpace)), connection_(url, std::move(settings), deadline) {}
 
+RemoteClient::~RemoteClient() = default;
+
 OperationResponse RemoteClient::ask(const OperationRequest& request) {
     try {
         const HttpResponse response = connection_.post(
@@ -222,15 +230,12 @@ Response RemoteClient::get(const cimom::ObjectPath& path) {
     return response;
 }
 
-Response RemoteClient::modify(const cimom::Instance& instance) {
-    std::vector<std::string> names;
-    for (const cimom::NamedValue& property : instance.properties) {
-        names.push_back(property.name);
-    }
+Response RemoteClient::modify(const cimom::Instance& instance,
+                              const std::vector<std::string>& properties) {
     OperationRequest request("ModifyInstance", instance.path.nameSpace);
     request.namedInstance("ModifiedInstance", instance)
         .flag("IncludeQualifiers", false)
-        .texts("PropertyList", names);
+        .texts("PropertyList", properties);
     return instancesOf(request);
 }
 
@@ -322,9 +327,7 @@ MachineInterfaces RemoteClient::interfaces(const ServedInstances& served) {
     for (const auto& path : systems.paths) {
         processors.push_back(heldText(path->key("Name")));
     }
-    return {interfacesOf(served.settings ? *served.settings : nothing,
-                         endpoints ? *endpoints : nothing, processors),
-            {}};
+    return {interfacesOf(served.settings ? *served.settings : nothing, endpoints, processors), {}};
 }
 
 std::optional<std::string> RemoteClient::dataDir() const {

@@ -3,11 +3,15 @@
 #include <memory>
 #include <string>
 #include <unordered_map>
+#include <vector>
 
-#include "cimxml/OperationRequest.h"
-#include "cimxml/OperationResponse.h"
 #include "client/Client.h"
 #include "client/HttpConnection.h"
+
+namespace cimom::wbem {
+class OperationRequest;
+struct OperationResponse;
+}  // namespace cimom::wbem
 
 namespace cimdhcp {
 
@@ -18,6 +22,9 @@ class RemoteClient : public Client {
   public:
     RemoteClient(const ServerUrl& url, HttpSettings settings, const Deadline& deadline,
                  std::string nameSpace);
+    ~RemoteClient() override;
+    RemoteClient(const RemoteClient&) = delete;
+    RemoteClient& operator=(const RemoteClient&) = delete;
 
     /// Each class is asked for once, when it is first needed.
     [[nodiscard]] ClassLookup classes() override;
@@ -33,7 +40,8 @@ class RemoteClient : public Client {
     Response enumerateNames(const cimom::ObjectPath& path) override;
     Response enumerate(const cimom::ObjectPath& path) override;
     Response get(const cimom::ObjectPath& path) override;
-    Response modify(const cimom::Instance& instance) override;
+    Response modify(const cimom::Instance& instance,
+                    const std::vector<std::string>& properties) override;
     Response associatorNames(const cimom::ObjectPath& path,
                              const cimom::AssociationRequest& request) override;
     Response associators(const cimom::ObjectPath& path,

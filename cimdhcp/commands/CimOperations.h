@@ -2,10 +2,11 @@
 
 #include "arguments/Commands.h"
 #include "cimom/ObjectPath.h"
-#include "client/Client.h"
 #include "client/Response.h"
 
 namespace cimdhcp {
+
+class Client;
 
 /// One CIM operation that was carried out, whatever the status of its response.
 struct CimOperation {
@@ -18,8 +19,12 @@ struct CimOperation {
 [[nodiscard]] CimOperation carryOut(const NamesCommand& command, Client& client);
 [[nodiscard]] CimOperation carryOut(const InstancesCommand& command, Client& client);
 [[nodiscard]] CimOperation carryOut(const GetCommand& command, Client& client);
-[[nodiscard]] CimOperation carryOut(const ModifyCommand& command, Client& client);
 [[nodiscard]] CimOperation carryOut(const AssociatorsCommand& command, Client& client);
 [[nodiscard]] CimOperation carryOut(const ReferencesCommand& command, Client& client);
+
+/// Changes the properties that are named, and keeps the others: the instance is got, what
+/// is new put in, all of it sent, and read back. Throws Failure, too, when a property
+/// cannot be written, and when nothing was changed or is other than wanted.
+[[nodiscard]] CimOperation carryOut(const ModifyCommand& command, Client& client);
 
 }  // namespace cimdhcp

@@ -4,11 +4,12 @@
 #include <string>
 
 #include "arguments/Commands.h"
-#include "client/Client.h"
 #include "text/Failure.h"
 #include "text/Presentation.h"
 
 namespace cimdhcp {
+
+class Client;
 
 /// The outcome of a command.
 struct Outcome {

@@ -1,18 +1,30 @@
 #include "commands/PlatformSetup.h"
 
+#include <fcntl.h>
+#include <sys/mman.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <array>
 #include <cerrno>
+#include <cstddef>
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
-#include <nlohmann/json.hpp>
+#include <optional>
 #include <ostream>
+#include <string_view>
 #include <system_error>
+#include <utility>
 
 #include "text/DisplayText.h"
 #include "text/Failure.h"
 #include "zrclient/InstrumentationService.h"
-#include "zrcommon/File.h"
+#include "zrclient/Snapshot.h"
+#include "zrclient/TreeFile.h"
 #include "zrcommon/PlatformSettings.h"
+#include "zrcommon/UniqueFd.h"
 
 namespace cimdhcp {
 
@@ -24,41 +36,111 @@ void setVariable(const char* name, const std::optional<std::string>& value) {
     }
 }
 
-/// "line 2, column 13: ..." of a parser's message, which has its own number in front
-/// and the text around the place at its end.
-std::string placeAndReason(const std::string& message) {
-    const std::size_t start = message.find("line ");
-    const std::size_t end = message.rfind("; last read:");
-    return printable(start == std::string::npos ? message : message.substr(start, end - start));
+constexpr const char* treeVariable = "ZR_INSTRUMENTATION_TREE";
+constexpr std::size_t largestTree = std::size_t{10} << 20U;  // as large as the platform reads
+
+struct Tree {
+    std::string name;     ///< what a person knows it by
+    ZR::UniqueFd memory;  ///< of what could be read only once; kept open for all who read it
+};
+
+Tree& tree() {
+    static Tree tree;
+    return tree;
+}
+
+[[noreturn]] void failWith(int error) {
+    throw Failure(ExitStatus::notLoaded, tree().name + ": " + std::strerror(error));
+}
+
+/// Everything up to the end.
+std::string readWhole(int fd) {
+    std::string content;
+    std::array<char, 65536> piece{};
+    for (;;) {
+        const ssize_t got = ::read(fd, piece.data(), piece.size());
+        if (got < 0 && errno == EINTR) {
+            continue;
+        }
+        if (got < 0) {
+            failWith(errno);
+        }
+        if (got == 0) {
+            return content;
+        }
+        content.append(piece.data(), static_cast<std::size_t>(got));
+        if (content.size() > largestTree) {
+            failWith(EFBIG);
+        }
+    }
+}
+
+void writeWhole(int fd, std::string_view content) {
+    while (!content.empty()) {
+        const ssize_t written = ::write(fd, content.data(), content.size());
+        if (written < 0 && errno != EINTR) {
+            failWith(errno);
+        }
+        content.remove_prefix(static_cast<std::size_t>(std::max<ssize_t>(written, 0)));
+    }
+}
+
+/// A file in memory with what can be read only once.
+std::string keepInMemory(int fd) {
+    const std::string content = readWhole(fd);
+    ZR::UniqueFd memory{::memfd_create("tree", MFD_CLOEXEC)};
+    if (!memory) {
+        failWith(errno);
+    }
+    writeWhole(memory.get(), content);
+    std::string path = "/proc/self/fd/" + std::to_string(memory.get());
+    tree().memory = std::move(memory);
+    return path;
+}
+
+/// Pipes, and devices such as terminals: what is read from them is gone.
+bool isReadOnce(const std::string& path) {
+    struct stat status {};
+    return ::stat(path.c_str(), &status) == 0 &&
+           (S_ISFIFO(status.st_mode) || S_ISCHR(status.st_mode) || S_ISSOCK(status.st_mode));
+}
+
+/// Makes the tree one that every copy of the platform can read, and names it to them.
+void handOverTree(const std::optional<std::string>& option) {
+    if (option == "-") {
+        tree().name = "standard input";
+        setVariable(treeVariable, keepInMemory(STDIN_FILENO));
+        return;
+    }
+    tree().name = option ? *option : ZR::PlatformSettings::read([](const char* name) {
+                                         return std::getenv(name);
+                                     }).instrumentationTree;
+    if (isReadOnce(tree().name)) {
+        const ZR::UniqueFd fd{::open(tree().name.c_str(), O_RDONLY | O_CLOEXEC | O_NOCTTY)};
+        if (!fd) {
+            failWith(errno);
+        }
+        setVariable(treeVariable, keepInMemory(fd.get()));
+    } else {
+        setVariable(treeVariable, option);
+    }
 }
 
 /// With an unusable file the platform goes on with an empty tree, and logs why. A person
 /// would be misled by an empty result: here it is a failure.
-void checkTree(const std::string& file) {
-    const auto content = ZR::File::read(file);
-    if (!content) {
-        throw Failure(ExitStatus::notLoaded, file + ": " + std::strerror(errno));
-    }
-    nlohmann::json tree;
-    try {
-        tree = nlohmann::json::parse(*content);
-    } catch (const nlohmann::json::parse_error& error) {
-        throw Failure(ExitStatus::notLoaded, file + ": " + placeAndReason(error.what()));
-    }
-    const bool empty = tree.is_object() && tree.contains("nodes") && tree["nodes"].is_array() &&
-                       tree["nodes"].empty();
-    if (!empty && ZR::InstrumentationService::process().current()->nodes().empty()) {
-        throw Failure(ExitStatus::notLoaded,
-                      file +
-                          ": this JSON is not an instrumentation tree (the system log has the "
-                          "line and the reason); \"cimdhcp tree\" prints an example");
+void checkTree(const std::string& path) {
+    auto& service = ZR::InstrumentationService::process();
+    service.useSource(ZR::openTreeFile(path, tree().name));
+    const auto snapshot = service.current();
+    if (snapshot->nodes().empty() && !snapshot->diagnostics().empty()) {
+        throw Failure(ExitStatus::notLoaded, printable(snapshot->diagnostics().front().text));
     }
 }
 
 }  // namespace
 
 void setUpPlatform(const Options& options, std::ostream& err) {
-    setVariable("ZR_INSTRUMENTATION_TREE", options.tree);
+    handOverTree(options.tree);
     setVariable("ZR_DATA_DIR", options.dataDir);
     const ZR::PlatformSettings& settings = ZR::PlatformSettings::process();
     for (const std::string& diagnostic : settings.diagnostics) {
@@ -74,6 +156,10 @@ void setUpPlatform(const Options& options, std::ostream& err) {
         !std::filesystem::is_directory(*options.dataDir, error)) {
         throw Failure(ExitStatus::notLoaded, *options.dataDir + ": is not a directory");
     }
+}
+
+const std::string& treeName() {
+    return tree().name;
 }
 
 }  // namespace cimdhcp

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <iosfwd>
+#include <string>
 
 #include "arguments/Commands.h"
 
@@ -11,8 +12,14 @@ namespace cimdhcp {
 /// is loaded. Call before that, and before the platform's settings are asked for
 /// in this process.
 ///
+/// A tree that cannot be read twice, as "-" for standard input, a pipe or a FIFO, is read
+/// once and whole into memory, where every copy of the platform finds it.
+///
 /// Writes a line to `err` for each setting that cannot be used. Throws Failure
 /// when the tree is not a file of a JSON tree or the data directory is not a directory.
 void setUpPlatform(const Options& options, std::ostream& err);
+
+/// What a person knows the tree by that setUpPlatform() handed over; empty: there is none.
+[[nodiscard]] const std::string& treeName();
 
 }  // namespace cimdhcp

@@ -1,9 +1,16 @@
 #include "commands/Rename.h"
 
+#include <algorithm>
+#include <cstddef>
 #include <utility>
 #include <vector>
 
+#include "cimom/Instance.h"
+#include "client/Client.h"
+#include "client/MachineInterfaces.h"
+#include "client/Response.h"
 #include "commands/RenameFiles.h"
+#include "commands/RenameRefusals.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
 #include "text/JsonText.h"
@@ -82,18 +89,60 @@ std::string nameNow(const cimom::ObjectPath& path, Client& client) {
     return {};
 }
 
-void prepareFile(const RenameCommand& command, RenameReport& report) {
-    if (ZR::File::exists(ZR::make_wstring(report.file))) {
+/// The line of a name, cut where it is longer than a person reads.
+std::string nameLineOf(const std::string& name) {
+    constexpr std::size_t longest = 60;
+    return std::string(ZR::InterfaceFile::configurationName) + '=' +
+           printable(name.substr(0, longest)) + (name.size() > longest ? "..." : "");
+}
+
+/// Throws what speaks against a rename, unless it is forced.
+void refuse(const std::vector<std::string>& refusals, const std::string& about,
+            const RenameCommand& command) {
+    constexpr std::size_t mostTold = 4;
+    if (refusals.empty() || command.force) {
         return;
     }
-    if (!command.create) {
-        throw Failure(ExitStatus::notDone, report.interfaceName +
-                                               " has no configuration file: there is no " +
-                                               printable(report.file) + "; --create makes it");
+    std::string text;
+    for (std::size_t i = 0; i < std::min(refusals.size(), mostTold); ++i) {
+        text += (i == 0 ? "" : "; ") + refusals[i];
     }
-    report.directoryCreated = createDataDirectory(report.dataDir);
-    createConfigurationFile(report.file, report.interfaceName, command.name);
-    report.fileCreated = true;
+    if (refusals.size() > mostTold) {
+        text += "; and " + std::to_string(refusals.size() - mostTold) + " more";
+    }
+    throw Failure(ExitStatus::notDone,
+                  about + text + "; nothing was changed, --force does it all the same");
+}
+
+void prepareFile(const RenameCommand& command, RenameReport& report) {
+    if (!ZR::File::exists(ZR::make_wstring(report.file))) {
+        if (!command.create) {
+            throw Failure(ExitStatus::notDone, report.interfaceName +
+                                                   " has no configuration file: there is no " +
+                                                   printable(report.file) + "; --create makes it");
+        }
+        report.directoryCreated = createDataDirectory(report.dataDir);
+        createConfigurationFile(report.file, report.interfaceName, command.name);
+        report.fileCreated = true;
+        return;
+    }
+    // What cannot be read is left to the provider, which leaves it as it is.
+    if (const auto content = ZR::File::read(report.file)) {
+        refuse(refusalsOfContent(*content), printable(report.file) + ": ", command);
+        if (lacksLineEnd(*content)) {
+            endLastLine(report.file);
+            report.lineEnded = true;
+        }
+    }
+}
+
+/// What is so after a failure, behind its message.
+std::string stateNow(const RenameReport& report) {
+    if (report.file.empty()) {
+        return {};
+    }
+    return "; " + std::string(report.fileCreated ? "made by this command, " : "") +
+           printable(nameInFile(report.file));
 }
 
 std::string fileOf(const Setting& setting, const std::string& dataDir) {
@@ -115,6 +164,8 @@ RenameReport rename(const RenameCommand& command, Client& client) {
                           "\" cannot be a configuration name: it must be one line, without blanks "
                           "at its ends or quotation marks around it");
     }
+    refuse(refusalsOfName(command.name), "the line would be " + nameLineOf(command.name) + ": ",
+           command);
     const Setting setting = find(command.interfaceName, settings(client));
     RenameReport report;
     report.interfaceName = setting.interfaceName;
@@ -130,18 +181,21 @@ RenameReport rename(const RenameCommand& command, Client& client) {
 
     const cimom::Instance wanted{setting.path,
                                  {{nameProperty, cimom::Value::ofString(command.name)}}};
-    const Response response = client.modify(wanted);
+    const Response response = client.modify(wanted, {nameProperty});
     if (!response.status.ok()) {
-        throw client.failure(response, setting.path);
+        const Failure failure = client.failure(response, setting.path);
+        throw Failure(failure.status(), failure.what() + stateNow(report));
     }
     const std::string name = nameNow(setting.path, client);
     if (name != command.name) {
+        const bool still = name == report.oldName;
         throw Failure(ExitStatus::notDone,
                       "the configuration name of " + printable(report.interfaceName) +
-                          " is still \"" + printable(name) + "\": " +
+                          (still ? " is still \"" : " is now \"") + printable(name) + "\": " +
                           (report.file.empty()
                                ? "that machine has no configuration file for it, or cannot write it"
-                               : printable(whyUnchanged(report.file))));
+                               : printable(whyUnchanged(report.file))) +
+                          stateNow(report));
     }
     return report;
 }
@@ -154,6 +208,9 @@ std::string renameText(const RenameReport& report) {
     if (report.fileCreated) {
         text += "Made the file " + printable(report.file) + ".\n";
     }
+    if (report.lineEnded) {
+        text += "Ended the last line of " + printable(report.file) + ".\n";
+    }
     text += printable(report.interfaceName) + ": the configuration name is now \"" +
             printable(report.newName) + '"';
     if (!report.oldName.empty()) {
@@ -162,12 +219,22 @@ std::string renameText(const RenameReport& report) {
     return text + (report.file.empty() ? "" : " (" + printable(report.file) + ')') + ".\n";
 }
 
+std::string renameRemarks(const RenameCommand& command, const RenameReport& report) {
+    if (!report.file.empty() || command.force) {
+        return {};
+    }
+    return "cimdhcp: the configuration file on that machine could not be looked at first: lines "
+           "that only contain CONFIG_NAME were replaced, too, and a last line without an end was "
+           "written on, if there were any\n";
+}
+
 std::string renameJson(const RenameReport& report) {
     return jsonText(JsonMembers{{"operation", "rename"},
                                 {"interface", report.interfaceName},
                                 {"file", textOrNull(report.file)},
                                 {"fileCreated", report.fileCreated},
                                 {"directoryCreated", report.directoryCreated},
+                                {"lineEnded", report.lineEnded},
                                 {"oldName", textOrNull(report.oldName)},
                                 {"newName", report.newName}});
 }

@@ -11,7 +11,9 @@
 #include <string_view>
 #include <vector>
 
+#include "commands/RenameRefusals.h"
 #include "text/Failure.h"
+#include "zrcommon/File.h"
 #include "zrcommon/InterfaceFile.h"
 #include "zrcommon/PropertyFile.h"
 #include "zrcommon/UniqueFd.h"
@@ -88,6 +90,14 @@ void createConfigurationFile(const std::string& path, const std::string& interfa
     }
 }
 
+void endLastLine(const std::string& path) {
+    const ZR::UniqueFd fd{::open(path.c_str(), O_WRONLY | O_APPEND | O_CLOEXEC | O_NOCTTY)};
+    const int error = fd ? writeAll(fd.get(), "\n") : errno;
+    if (error != 0) {
+        fail("cannot end the last line of " + path, error);
+    }
+}
+
 std::string whyUnchanged(const std::string& path) {
     struct stat status {};
     if (::stat(path.c_str(), &status) != 0) {
@@ -103,6 +113,14 @@ std::string whyUnchanged(const std::string& path) {
         }
     }
     return path + " was not changed; the system log may tell why";
+}
+
+std::string nameInFile(const std::string& path) {
+    const auto content = ZR::File::read(path);
+    if (!content) {
+        return path + " cannot be read (" + std::strerror(errno) + ")";
+    }
+    return path + " now holds " + namesIn(*content);
 }
 
 }  // namespace cimdhcp

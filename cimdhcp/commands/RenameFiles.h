@@ -18,7 +18,13 @@ bool createDataDirectory(const std::string& dataDir);
 void createConfigurationFile(const std::string& path, const std::string& interfaceName,
                              const std::string& name);
 
+/// Gives the last line of a file its end. Throws Failure.
+void endLastLine(const std::string& path);
+
 /// Why the provider could not change a file, as far as this process can see.
 [[nodiscard]] std::string whyUnchanged(const std::string& path);
+
+/// What a configuration file says of the name now, or why that cannot be told.
+[[nodiscard]] std::string nameInFile(const std::string& path);
 
 }  // namespace cimdhcp

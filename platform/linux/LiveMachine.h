@@ -2,6 +2,7 @@
 
 #include <chrono>
 #include <cstdint>
+#include <ctime>
 #include <functional>
 #include <memory>
 #include <optional>
@@ -10,6 +11,7 @@
 #include <unordered_set>
 #include <vector>
 
+#include "Unannounced.h"
 #include "clients/ManagerBuses.h"
 #include "formats/Roots.h"
 #include "ipmi/IpmiReader.h"
@@ -25,11 +27,8 @@ namespace ZR::Live {
 struct Surroundings {
     Roots roots;
     std::unique_ptr<NetlinkTransport> transport = kernelTransport();
-    /// Seconds since the epoch.
-    std::function<std::int64_t()> now = [] {
-        return static_cast<std::int64_t>(
-            std::chrono::system_clock::to_time_t(std::chrono::system_clock::now()));
-    };
+    /// Seconds since the epoch. Asked with each request.
+    std::function<std::int64_t()> now = [] { return std::int64_t{std::time(nullptr)}; };
     /// False when the process file system is one that was laid out: its numbers
     /// then are those of other processes.
     bool realProcesses = true;
@@ -55,7 +54,7 @@ class LiveMachine final : public SnapshotSource {
     [[nodiscard]] std::shared_ptr<const Snapshot> tryToRead();
     [[nodiscard]] ClientFacts readClients();
     void watchProcesses(const ClientFacts& clients);
-    [[nodiscard]] bool socketsChanged() const;
+    [[nodiscard]] bool changedByTime();
     void planAnotherTry(const std::vector<Diagnostic>& diagnostics);
     void report(const std::vector<Diagnostic>& diagnostics);
 
@@ -65,9 +64,12 @@ class LiveMachine final : public SnapshotSource {
     ChangeMonitor monitor_;
     IpmiReader processor_;
     std::vector<WatchedPlace> places_;
-    std::optional<ClientSockets> sockets_;               // where nothing else tells of who has them
-    std::unordered_set<std::string> reported_;           // of the last reading
-    bool troubled_ = false;                              // something could not be read
+    Unannounced unannounced_;
+    std::int64_t readAt_ = 0;                   // when the last snapshot was made
+    std::int64_t changesAt_ = 0;                // when it is no longer true, though nothing happens
+    std::int64_t lookedAt_ = 0;                 // for what nothing announces
+    std::unordered_set<std::string> reported_;  // of the last reading
+    bool troubled_ = false;                     // something could not be read
     std::chrono::steady_clock::time_point troubleRest_;  // it is not tried again before
 };
 

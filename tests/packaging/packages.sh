@@ -41,10 +41,10 @@ for page in man1/cimdhcp.1 man5/zr-platform.conf.5 man8/provider-register.sh.8; 
     test -s /usr/share/man/$page.gz
 done
 echo "== use"
-mkdir -p /var/lib/dhcp-client-provider
+stat --format='%U %a' /var/lib/dhcp-client-provider
 printf 'DEVICE=eth0\nCONFIG_NAME=old\n' >/var/lib/dhcp-client-provider/ifcfg-eth0
 cimdhcp --tree /tree.json show
-cimdhcp --tree /tree.json --data-dir /var/lib/dhcp-client-provider rename eth0 new
+cimdhcp --tree /tree.json rename eth0 new
 grep -x CONFIG_NAME=new /var/lib/dhcp-client-provider/ifcfg-eth0
 cimdhcp --tree /tree.json classes | tail -n +2 | wc -l
 DESTDIR=/stage /usr/share/dhcp-client-provider/provider-register.sh -t sfcb -v | grep -c written
@@ -96,6 +96,7 @@ cat >"$directory/expected" <<'TEXT'
 /usr/bin/cimdhcp
 ExecStart=/usr/bin/cimdhcp serve --read-only
 == use
+root 755
 INTERFACE  DHCP  STATE   ADDRESS        SERVERS                 CONFIGURATION NAME
 eth0       on    bound   192.0.2.17     192.0.2.1, 2001:db8::1  old
 wlan0      on    bound   198.51.100.23  198.51.100.1            -

@@ -34,10 +34,6 @@ struct ClientFacts {
     /// whose namespace is hidden is believed: the files that it left are beside ours.
     [[nodiscard]] bool runs(Client client) const noexcept;
 
-    /// Whether the sockets may be all that there is to see of a DHCPv4 client: no program
-    /// that could have them was found for this network namespace.
-    [[nodiscard]] bool socketsStandAlone() const noexcept;
-
     /// Whether such a program runs for other network namespaces alone: the indexes in
     /// its files are then those of other links.
     [[nodiscard]] bool runsElsewhere(Client client) const noexcept;

@@ -25,8 +25,18 @@ Json valueOf(const PropertyValue& value) {
         value);
 }
 
+/// Whether a property is the name of a host computer, and that name the one given.
+bool isName(const Snapshot::Node& node, const SnapshotProperty& property,
+            std::string_view hostName) {
+    const auto* const text = std::get_if<std::string>(&property.value);
+    return property.id == NodeLexicon::Properties::Name && text != nullptr && !hostName.empty() &&
+           *text == hostName &&
+           NodeLexicon::nodeTypeOf(node.type) == NodeLexicon::NodeType::ComputerSystem &&
+           node.description != NodeLexicon::serviceProcessorDescription;
+}
+
 /// A node without its children.
-Json alone(const Snapshot& snapshot, Snapshot::Index index) {
+Json alone(const Snapshot& snapshot, Snapshot::Index index, std::string_view hostName) {
     const Snapshot::Node& node = snapshot.node(index);
     Json result{{"type", node.type}, {"description", node.description}};
     Json properties = Json::object();
@@ -37,7 +47,8 @@ Json alone(const Snapshot& snapshot, Snapshot::Index index) {
         if (name.empty()) {
             continue;  // a number outside the lexicon has no name that it could be read back by
         }
-        properties[name] = valueOf(property.value);
+        properties[name] =
+            isName(node, property, hostName) ? Json("${HOSTNAME}") : valueOf(property.value);
         if (property.readOnly) {
             readOnly.push_back(name);
         }
@@ -66,14 +77,14 @@ Json turned(std::vector<Json> nodes) {
 
 }  // namespace
 
-std::string toJson(const Snapshot& snapshot) {
+std::string toJson(const Snapshot& snapshot, std::string_view hostName) {
     // A child lies behind its parent, so from the end backwards every node is
     // complete when its turn comes. The last list is that of the roots.
     const std::size_t count = snapshot.nodes().size();
     std::vector<std::vector<Json>> children(count + 1);
     for (std::size_t back = count; back > 0; --back) {
         const auto index = static_cast<Snapshot::Index>(back - 1);
-        Json node = alone(snapshot, index);
+        Json node = alone(snapshot, index, hostName);
         if (!children[index].empty()) {
             node["children"] = turned(std::exchange(children[index], {}));
         }

@@ -1,7 +1,5 @@
 #include "zrcommon/PlatformSettings.h"
 
-#include <sys/stat.h>
-
 #include <array>
 #include <cerrno>
 #include <charconv>
@@ -53,8 +51,12 @@ const char* applySink(std::string_view value, PlatformSettings& settings) {
 }
 
 const char* applyDataDir(std::string_view value, PlatformSettings& settings) {
-    settings.dataDir = value;  // empty: the default, which is looked for at the end
-    return value.empty() ? "not a directory (empty)" : nullptr;
+    if (value.empty()) {
+        setDefault<&PlatformSettings::dataDir>(settings);
+        return "not a directory (empty)";
+    }
+    settings.dataDir = value;
+    return nullptr;
 }
 
 const char* applyTree(std::string_view value, PlatformSettings& settings) {
@@ -108,22 +110,6 @@ void readFile(const std::string& file, bool mustExist, PlatformSettings& setting
     }
 }
 
-/// The first of the usual directories of ifcfg files that exists, else our own.
-std::string defaultDataDir() {
-    constexpr std::array directories{
-        "/etc/sysconfig/network-scripts/",
-        "/etc/sysconfig/network/",
-        "/var/lib/dhcp-client-provider/",
-    };
-    for (const char* directory : directories) {
-        struct stat status {};
-        if (::stat(directory, &status) == 0 && S_ISDIR(status.st_mode)) {
-            return directory;
-        }
-    }
-    return directories.back();
-}
-
 }  // namespace
 
 PlatformSettings PlatformSettings::read(const Environment& environment) {
@@ -143,9 +129,6 @@ PlatformSettings PlatformSettings::read(const Environment& environment) {
             settings.diagnostics.push_back(std::string(setting.variable) + "=" + quoted(value) +
                                            ": " + fault);
         }
-    }
-    if (settings.dataDir.empty()) {
-        settings.dataDir = defaultDataDir();
     }
     if (settings.dataDir.back() != '/') {
         settings.dataDir += '/';

@@ -81,6 +81,8 @@ TEST_F(CommandLineText, TakesEachCommand) {
               Command(ModifyCommand{"P", {"A=1", "B={1, 2}", "C="}}));
     EXPECT_EQ(line({"rename", "eth0", "office"}).command,
               Command(RenameCommand{"eth0", "office", false}));
+    EXPECT_EQ(line({"rename", "eth0", "office", "--force"}).command,
+              Command(RenameCommand{"eth0", "office", false, true}));
     EXPECT_EQ(line({"rename", "--create", "eth0", "office"}).command,
               Command(RenameCommand{"eth0", "office", true}));
     EXPECT_EQ(line({"associators", "P"}).command,

@@ -62,8 +62,67 @@ TEST_F(Modify, RefusesPropertiesThatTheClassDoesNotHave) {
 TEST_F(Modify, IsRefusedByClassesThatCannotBeChanged) {
     EXPECT_EQ(run({"modify", "QVXZR_DHCPCapabilities.InstanceID=\"eth0\"", "MaxElementNameLen=4"}),
               (Ended{1, "",
-                     "cimdhcp: CIM_ERR_NOT_SUPPORTED: ModifyInstance of QVXZR_DHCPCapabilities is "
-                     "not supported\n"}));
+                     "cimdhcp: not changed: MaxElementNameLen of QVXZR_DHCPCapabilities cannot be "
+                     "written\n"}));
+}
+
+TEST_F(Modify, RefusesPropertiesThatTheProviderDoesNotTake) {
+    writeConfiguration("eth0", "CONFIG_NAME=home\n");
+    // The standard's class lets a client write the one, and none the other.
+    for (const char* property : {"ClientIdentifier", "ElementName", "InstanceID"}) {
+        EXPECT_EQ(run({"modify", setting, std::string(property) + "=x"}),
+                  (Ended{1, "",
+                         "cimdhcp: not changed: " + std::string(property) +
+                             " of QVXZR_DHCPSettingData cannot be written, only ConfigurationName "
+                             "can\n"}));
+    }
+    EXPECT_EQ(run({"modify", setting, "ConfigurationName=x", "ElementName=y"}).status, 1);
+    EXPECT_EQ(readFile(configuration("eth0")), "CONFIG_NAME=home\n");
+}
+
+TEST_F(Modify, RefusesAnInstanceThatDoesNotExist) {
+    EXPECT_EQ(run({"modify", "QVXZR_DHCPSettingData.InstanceID=\"Computer%eth7\"",
+                   "ConfigurationName=x"}),
+              (Ended{1, "",
+                     "cimdhcp: CIM_ERR_NOT_FOUND: there is no "
+                     "root/cimv2:QVXZR_DHCPSettingData.InstanceID=\"Computer%eth7\"; \"cimdhcp "
+                     "names QVXZR_DHCPSettingData\" lists what there is\n"}));
+}
+
+TEST_F(Modify, RefusesBlanksAtTheEnds) {
+    writeConfiguration("eth0", "CONFIG_NAME=home\n");
+    for (const char* name : {" x", "x ", " "}) {
+        EXPECT_EQ(run({"modify", setting, std::string("ConfigurationName=") + name}),
+                  (Ended{2, "",
+                         "cimdhcp: ConfigurationName cannot be \"" + std::string(name) +
+                             "\": blanks at its ends would not come back\n"}));
+    }
+    EXPECT_EQ(readFile(configuration("eth0")), "CONFIG_NAME=home\n");
+}
+
+TEST_F(Modify, TellsThatNothingWasChanged) {
+    // The provider returns OK without a file, too.
+    EXPECT_EQ(
+        run({"modify", setting, "ConfigurationName=office"}),
+        (Ended{1, "",
+               "cimdhcp: not changed: ConfigurationName is still not set, not \"office\"\n"}));
+    writeConfiguration("eth0", "CONFIG_NAME=home\n");
+    EXPECT_EQ(run({"modify", setting, "ConfigurationName=home"}),
+              (Ended{1, "", "cimdhcp: not changed: ConfigurationName is \"home\" already\n"}));
+}
+
+TEST_F(Modify, TellsWhatCameOutOtherThanWanted) {
+    writeConfiguration("eth0", "CONFIG_NAME=home\n");
+    EXPECT_EQ(run({"modify", setting, "ConfigurationName='x'"}),
+              (Ended{1, "",
+                     "cimdhcp: not changed as wanted: ConfigurationName is now \"x\", not "
+                     "\"'x'\"\n"}));
+}
+
+TEST_F(Modify, TakesTheNameAway) {
+    writeConfiguration("eth0", "CONFIG_NAME=home\n");
+    EXPECT_EQ(run({"modify", setting, "ConfigurationName="}), (Ended{0, "Modified.\n", ""}));
+    EXPECT_EQ(readFile(configuration("eth0")), "CONFIG_NAME=\n");
 }
 
 TEST_F(Modify, NeedsAnInstance) {

@@ -1,4 +1,6 @@
+#include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <unistd.h>
 
 #include <filesystem>
 
@@ -8,6 +10,7 @@ namespace {
 
 namespace fs = std::filesystem;
 using test::Ended;
+using testing::HasSubstr;
 using ZR::Testing::readFile;
 
 class Rename : public test::ProgramTest {
@@ -19,12 +22,12 @@ class Rename : public test::ProgramTest {
 
 TEST_F(Rename, ChangesTheNameAndTellsTheOldOne) {
     writeConfiguration("eth0", "# mine\nDEVICE=eth0\nCONFIG_NAME=home\n");
-    EXPECT_EQ(run({"rename", "eth0", "the office"}),
+    EXPECT_EQ(run({"rename", "eth0", "the-office"}),
               (Ended{0,
-                     "eth0: the configuration name is now \"the office\", was \"home\" (" +
+                     "eth0: the configuration name is now \"the-office\", was \"home\" (" +
                          configuration("eth0") + ").\n",
                      ""}));
-    EXPECT_EQ(nameOf("eth0"), "# mine\nDEVICE=eth0\nCONFIG_NAME=the office\n");
+    EXPECT_EQ(nameOf("eth0"), "# mine\nDEVICE=eth0\nCONFIG_NAME=the-office\n");
 }
 
 TEST_F(Rename, GivesANameToAnInterfaceThatHadNone) {
@@ -92,6 +95,7 @@ TEST_F(Rename, TellsInJsonWhatItDid) {
   "file": ")" + configuration("eth0") + R"(",
   "fileCreated": true,
   "directoryCreated": false,
+  "lineEnded": false,
   "oldName": null,
   "newName": "office"
 }
@@ -130,13 +134,104 @@ TEST_F(Rename, RefusesNamesThatWouldNotComeBack) {
     EXPECT_EQ(nameOf("eth0"), "CONFIG_NAME=home\n");
 }
 
+TEST_F(Rename, RefusesNamesThatAShellWouldReadOtherwise) {
+    writeConfiguration("eth0", "CONFIG_NAME=home\n");
+    EXPECT_EQ(run({"rename", "eth0", "the office"}),
+              (Ended{1, "",
+                     "cimdhcp: the line would be CONFIG_NAME=the office: the name has a blank: a "
+                     "shell that reads the file ends the name there, and runs what follows; "
+                     "nothing was changed, --force does it all the same\n"}));
+    for (const char* name : {"$HOME", "a`b`", "a;b", "it's", "a\\b", "a>b", "~"}) {
+        EXPECT_EQ(run({"rename", "eth0", name}).status, 1) << name;
+        EXPECT_EQ(run({"rename", "eth1", name, "--create"}).status, 1) << name;
+    }
+    EXPECT_EQ(nameOf("eth0"), "CONFIG_NAME=home\n");
+    EXPECT_FALSE(fs::exists(configuration("eth1")));
+    EXPECT_EQ(run({"rename", "eth0", "the office", "--force"}).status, 0);
+    EXPECT_EQ(nameOf("eth0"), "CONFIG_NAME=the office\n");
+}
+
+TEST_F(Rename, RefusesNamesThatAreTooLongForTheNextRename) {
+    writeConfiguration("eth0", "CONFIG_NAME=home\n");
+    const std::string longest(490, 'a');
+    const Ended refused = run({"rename", "eth0", longest + "a"});
+    EXPECT_EQ(refused.status, 1);
+    EXPECT_THAT(refused.err, HasSubstr("the name has 491 bytes, more than 490"));
+    EXPECT_EQ(nameOf("eth0"), "CONFIG_NAME=home\n");
+    EXPECT_EQ(run({"rename", "eth0", longest}).status, 0);
+    EXPECT_EQ(run({"rename", "eth0", "short"}).status, 0);
+    EXPECT_EQ(nameOf("eth0"), "CONFIG_NAME=short\n");
+}
+
+TEST_F(Rename, RefusesFilesOfWhichOtherLinesWouldBeReplaced) {
+    const std::string content = "# CONFIG_NAME is mine\nCONFIG_NAME=home\nOLD_CONFIG_NAME=x\n";
+    writeConfiguration("eth0", content);
+    EXPECT_EQ(run({"rename", "eth0", "office"}),
+              (Ended{1, "",
+                     "cimdhcp: " + configuration("eth0") +
+                         ": line 1, \"# CONFIG_NAME is mine\", contains CONFIG_NAME: the whole "
+                         "line would be replaced by the new name's line; line 3, "
+                         "\"OLD_CONFIG_NAME=x\", contains CONFIG_NAME: the whole line would be "
+                         "replaced by the new name's line; nothing was changed, --force does it "
+                         "all the same\n"}));
+    EXPECT_EQ(nameOf("eth0"), content);
+    EXPECT_EQ(run({"rename", "eth0", "office", "--force"}).status, 0);
+    EXPECT_EQ(nameOf("eth0"), "CONFIG_NAME=office\nCONFIG_NAME=office\nCONFIG_NAME=office\n");
+}
+
+TEST_F(Rename, RefusesFilesWithLinesThatWouldBeTakenForSeveral) {
+    const std::string content = "CONFIG_NAME=" + std::string(600, 'a') + "\n";
+    writeConfiguration("eth0", content);
+    const Ended refused = run({"rename", "eth0", "office"});
+    EXPECT_EQ(refused.status, 1);
+    EXPECT_THAT(refused.err, HasSubstr("line 1, \"CONFIG_NAME=aaa"));
+    EXPECT_THAT(refused.err, HasSubstr("has 612 bytes: "));
+    EXPECT_EQ(nameOf("eth0"), content);
+    // And that is what happens then.
+    EXPECT_EQ(run({"rename", "eth0", "office", "--force"}).status, 0);
+    EXPECT_EQ(nameOf("eth0"), "CONFIG_NAME=office\n" + std::string(101, 'a') + "\n");
+}
+
+TEST_F(Rename, EndsALastLineThatHasNoEnd) {
+    writeConfiguration("eth0", "DEVICE=eth0");
+    EXPECT_EQ(run({"rename", "eth0", "office"}).out,
+              "Ended the last line of " + configuration("eth0") +
+                  ".\neth0: the configuration name is now \"office\" (" + configuration("eth0") +
+                  ").\n");
+    EXPECT_EQ(nameOf("eth0"), "DEVICE=eth0\nCONFIG_NAME=office\n");
+    writeConfiguration("eth1", "CONFIG_NAME=home\nDEVICE=eth1");
+    EXPECT_THAT(run({"--format", "json", "rename", "eth1", "office"}).out,
+                HasSubstr("\"lineEnded\": true"));
+    EXPECT_EQ(nameOf("eth1"), "CONFIG_NAME=office\nDEVICE=eth1\n");
+}
+
 TEST_F(Rename, FindsOutThatItDidNotTakeEffect) {
     // The provider returns OK all the same.
     fs::create_directory(configuration("eth0"));
     EXPECT_EQ(run({"rename", "eth0", "office"}),
               (Ended{1, "",
                      "cimdhcp: the configuration name of eth0 is still \"\": " +
-                         configuration("eth0") + " is not a regular file\n"}));
+                         configuration("eth0") + " is not a regular file; " +
+                         configuration("eth0") + " cannot be read (Is a directory)\n"}));
+}
+
+TEST_F(Rename, TellsWhatTheFileHoldsAfterAFailure) {
+    writeConfiguration("eth0", "DEVICE=eth0\nCONFIG_NAME=home\n");
+    fs::permissions(configuration("eth0"), fs::perms(0444));
+    fs::permissions(dataDir(), fs::perms(0755));
+    fs::permissions(directory().path(), fs::perms(0755));
+    if (::geteuid() != 0) {
+        GTEST_SKIP() << "needs another user who may not write";
+    }
+    const Ended ended =
+        runAs("/usr/bin/setpriv",
+              {"--reuid=65534", "--regid=65534", "--clear-groups", program(), "--tree", tree(),
+               "--data-dir", dataDir(), "rename", "eth0", "office"});
+    EXPECT_EQ(ended,
+              (Ended{1, "",
+                     "cimdhcp: the configuration name of eth0 is still \"home\": " +
+                         configuration("eth0") + " cannot be written: Permission denied; " +
+                         configuration("eth0") + " now holds CONFIG_NAME=home in line 2\n"}));
 }
 
 TEST_F(Rename, RefusesInterfacesThatCannotHaveAFile) {

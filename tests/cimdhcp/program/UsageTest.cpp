@@ -1,3 +1,4 @@
+#include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
 #include "ProgramRun.h"
@@ -5,6 +6,7 @@
 namespace {
 
 using test::Ended;
+using testing::StartsWith;
 
 class Usage : public test::ProgramTest {
   protected:
@@ -51,19 +53,58 @@ TEST_F(Usage, ATreeThatCannotBeReadIsStatusThree) {
     EXPECT_EQ(plain({"--tree", missing, "show"}),
               (Ended{3, "", "cimdhcp: " + missing + ": No such file or directory\n"}));
     ZR::Testing::writeFile(tree(), "{\n  \"nodes\": [x]\n}");
-    EXPECT_EQ(
-        run({"tree"}),
-        (Ended{3, "",
-               "cimdhcp: " + tree() +
-                   ": line 2, column 13: syntax error while parsing value - invalid literal\n"}));
+    const Ended broken = run({"tree"});
+    EXPECT_EQ(broken.status, 3);
+    EXPECT_EQ(broken.out, "");
+    EXPECT_THAT(broken.err,
+                StartsWith("cimdhcp: " + tree() +
+                           ":2:13: syntax error while parsing value - invalid literal"));
     ZR::Testing::writeFile(tree(), R"({"nodes": [{"type": 7}]})");
-    const Ended notATree = run({"show"});
-    EXPECT_EQ(notATree.status, 3);
-    EXPECT_EQ(notATree.out, "");
-    EXPECT_EQ(notATree.err.substr(0, 66 + tree().size()),
-              "cimdhcp: " + tree() + ": this JSON is not an instrumentation tree (the system lo");
+    EXPECT_EQ(run({"show"}),
+              (Ended{3, "", "cimdhcp: " + tree() + ":1:21: \"type\" must be a text\n"}));
     // It does not matter how the tree was named.
     EXPECT_EQ(plain({"show"}, {{"ZR_INSTRUMENTATION_TREE", missing}}).status, 3);
+}
+
+TEST_F(Usage, ATreeIsReadFromStandardInputAndPipes) {
+    const Ended expected = run({"show"});
+    const Ended classes = run({"names", "CIM_ManagedElement"});
+    ASSERT_EQ(expected.status, 0);
+    const auto inShell = [this](const std::string& before, const std::string& file,
+                                const std::string& command, const std::string& after) {
+        return runAs("/bin/bash", {"-c", before + program() + " --tree " + file + " --data-dir " +
+                                             dataDir() + " " + command + after});
+    };
+    for (const std::string command : {"show", "names CIM_ManagedElement"}) {
+        const Ended& wanted = command == "show" ? expected : classes;
+        EXPECT_EQ(inShell("cat " + tree() + " | ", "-", command, ""), wanted);
+        EXPECT_EQ(inShell("", "-", command, " <" + tree()), wanted);
+        EXPECT_EQ(inShell("cat " + tree() + " | ", "/dev/stdin", command, ""), wanted);
+        EXPECT_EQ(inShell("", "/dev/stdin", command, " <" + tree()), wanted);
+        EXPECT_EQ(inShell("", "<(cat " + tree() + ")", command, ""), wanted);
+        const std::string fifo = directory() / "fifo";
+        EXPECT_EQ(inShell("rm -f " + fifo + "; mkfifo " + fifo + "; cat " + tree() + " >" + fifo +
+                              " & while ! test -p " + fifo + "; do :; done; ",
+                          fifo, command, ""),
+                  wanted);
+    }
+}
+
+TEST_F(Usage, ATreeFromStandardInputIsToldOfUnderThatName) {
+    const auto given = [this](const std::string& text, const std::string& command) {
+        ZR::Testing::writeFile(directory() / "input", text);
+        return runAs("/bin/sh", {"-c", "cat " + (directory() / "input") + " | " + program() +
+                                           " --tree - --data-dir " + dataDir() + " " + command});
+    };
+    EXPECT_EQ(given("{}", "show"),
+              (Ended{3, "", "cimdhcp: standard input:1:1: \"nodes\" is missing\n"}));
+    EXPECT_EQ(given(R"({"nodes": [{"type": "computersystem", "description": ""}]})", "tree").err,
+              "cimdhcp: standard input:1:21: the type \"computersystem\" is not known, "
+              "\"ComputerSystem\" is\n");
+    EXPECT_THAT(given(R"({"nodes": []})", "check").out,
+                testing::HasSubstr("machine: tree standard input has 0 interfaces"));
+    EXPECT_THAT(given(std::string((10U << 20U) + 1, ' '), "show").err,
+                "cimdhcp: standard input: File too large\n");
 }
 
 TEST_F(Usage, ADataDirectoryThatIsNoneIsStatusThree) {

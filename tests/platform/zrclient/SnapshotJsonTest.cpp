@@ -1,5 +1,7 @@
 #include "zrclient/SnapshotJson.h"
 
+#include <algorithm>
+
 #include "kit/ZrclientSupport.h"
 #include "sources/JsonTreeSource.h"
 
@@ -40,7 +42,10 @@ TEST(SnapshotJson, WritesAFileThatTheSourceReadsBackAsEqual) {
     const TemporaryDirectory directory;
     const auto snapshot = everyKind();
     writeFile(directory / "tree.json", toJson(*snapshot));
-    EXPECT_TRUE(*JsonTreeSource(directory / "tree.json").read() == *snapshot);
+    const auto again = JsonTreeSource(directory / "tree.json").read();
+    // It tells of the oddities in it, besides.
+    EXPECT_EQ(toJson(*again), toJson(*snapshot));
+    EXPECT_TRUE(std::ranges::equal(again->nodes(), snapshot->nodes()));
 }
 
 TEST(SnapshotJson, DifferentTreesAreNotEqual) {
@@ -86,6 +91,25 @@ TEST(SnapshotJson, StaysJsonWithBytesThatAreNoText) {
     SnapshotBuilder builder;
     builder.add(Snapshot::none, "T", "\xff\xfe");
     EXPECT_EQ(parsed(toJson(*builder.build()))->node(0).description, "\xef\xbf\xbd\xef\xbf\xbd");
+}
+
+TEST(SnapshotJson, TheNameOfTheMachineItselfIsWrittenForAnyMachine) {
+    SnapshotBuilder builder;
+    const auto computer = builder.add(Snapshot::none, "ComputerSystem", "Computer");
+    builder.property(Properties::Name, std::string("testhost"));
+    builder.add(computer, "NetworkInterface", "testhost");
+    builder.property(Properties::Name, std::string("testhost"));
+    builder.add(Snapshot::none, "ComputerSystem", "BMC");
+    builder.property(Properties::Name, std::string("testhost"));
+    builder.add(Snapshot::none, "ComputerSystem", "another");
+    builder.property(Properties::Name, std::string("testhost.example"));
+    const auto snapshot = builder.build();
+    const std::string json = toJson(*snapshot, "testhost");
+    EXPECT_NE(json.find("\"Name\": \"${HOSTNAME}\""), std::string::npos) << json;
+    EXPECT_EQ(json.find("${HOSTNAME}"), json.rfind("${HOSTNAME}")) << "the computer's alone";
+    EXPECT_TRUE(*parsed(json) == *snapshot);
+    EXPECT_EQ(toJson(*snapshot).find("${HOSTNAME}"), std::string::npos);
+    EXPECT_EQ(toJson(*snapshot, "").find("${HOSTNAME}"), std::string::npos);
 }
 
 TEST(SnapshotJson, TenThousandInterfacesComeBackEqual) {

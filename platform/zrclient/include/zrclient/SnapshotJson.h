@@ -1,6 +1,7 @@
 #pragma once
 
 #include <string>
+#include <string_view>
 
 #include "zrclient/Snapshot.h"
 
@@ -12,6 +13,9 @@ namespace ZR {
 /// "${HOSTNAME}". Bytes that are not UTF-8 become U+FFFD, so that the result is
 /// JSON whatever the snapshot holds. An unreadable value becomes null. Where properties
 /// came from, if that is known, is written as "origins", which readers pass over.
-[[nodiscard]] std::string toJson(const Snapshot& snapshot);
+///
+/// A host computer that is called `hostName` is written as "${HOSTNAME}", so that the
+/// tree is whole on a machine of another name.
+[[nodiscard]] std::string toJson(const Snapshot& snapshot, std::string_view hostName = {});
 
 }  // namespace ZR

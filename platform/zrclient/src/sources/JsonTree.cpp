@@ -4,10 +4,12 @@
 #include <array>
 #include <cstdint>
 #include <nlohmann/json.hpp>
+#include <set>
 #include <utility>
 #include <vector>
 
 #include "sources/TokenTracker.h"
+#include "sources/TreeSlips.h"
 
 namespace ZR {
 
@@ -73,7 +75,9 @@ const char* wanted(Slot slot) {
 struct ReadNode {
     Snapshot::Index parent = Snapshot::none;
     std::string type;
+    std::size_t typeAt = 0;  ///< offset in the text
     std::string description;
+    std::size_t nameAt = 0;  ///< offset of the value of its Name
     std::vector<SnapshotProperty> properties;
     std::vector<NodeLexicon::Properties> readOnly;
 };
@@ -82,8 +86,8 @@ struct ReadNode {
 /// returns whether to go on.
 class TreeReader {
   public:
-    TreeReader(std::string_view text, const std::string& hostName)
-        : text_(text), hostName_(hostName), tokens_(text) {}
+    TreeReader(std::string_view text, const std::string& hostName, std::string_view name)
+        : text_(text), hostName_(hostName), tokens_(text), slips_(text, name) {}
 
     JsonTree read() {
         if (!Json::sax_parse(tokens_.begin(), tokens_.end(), this)) {
@@ -94,32 +98,54 @@ class TreeReader {
 
     // The parser's events, under the names that it calls.
 
-    bool null() { return unreadable(0); }
-    bool boolean(bool value) { return scalar(PropertyValue(value), 0); }
-    bool number_integer(std::int64_t /*value*/) { return unreadable(1); }  // a negative one
+    bool null() {
+        if (next() == Slot::propertyEntry) {
+            lookAtKind(JsonKind::other);
+        }
+        return unreadable(0);
+    }
+    bool boolean(bool value) {
+        lookAtKind(JsonKind::truth);
+        return scalar(PropertyValue(value), 0);
+    }
+    bool number_integer(std::int64_t /*value*/) {  // a negative one
+        lookAtKind(JsonKind::other);
+        return unreadable(1);
+    }
     bool number_unsigned(std::uint64_t value) {
+        lookAtKind(JsonKind::number);
         if (next() == Slot::propertyEntry) {
             listIsReadable_ = listIsReadable_ && list_.empty();
             numbers_.push_back(value);
             return passed(1);
         }
+        if (next() == Slot::property) {
+            slips_.add(tokens_.start(), slipOfNumber(property_, value));
+        }
         return scalar(PropertyValue(value), 1);
     }
-    bool number_float(double /*value*/, const std::string& /*text*/) { return unreadable(1); }
+    bool number_float(double /*value*/, const std::string& /*text*/) {
+        lookAtKind(JsonKind::other);
+        return unreadable(1);
+    }
     bool binary(std::vector<std::uint8_t>& /*value*/) { return unreadable(0); }  // not in a text
 
     bool string(std::string& value) {
+        lookAtKind(JsonKind::text);
         switch (next()) {
             case Slot::type:
                 node().type = expanded(value);
+                node().typeAt = tokens_.start();
                 break;
             case Slot::description:
                 node().description = expanded(value);
                 break;
             case Slot::property:
+                lookAtText(value);
                 set(isReadable(value) ? PropertyValue(expanded(value)) : PropertyValue());
                 break;
             case Slot::propertyEntry:
+                lookAtText(value);
                 listIsReadable_ = listIsReadable_ && numbers_.empty() && isReadable(value);
                 list_.push_back(expanded(value));
                 break;
@@ -152,6 +178,7 @@ class TreeReader {
                     {slot, static_cast<Snapshot::Index>(nodes_.size() - 1), tokens_.start(), 0});
                 break;
             default:
+                lookAtKind(JsonKind::other);
                 return startIgnored(slot);
         }
         return passed(0);
@@ -191,6 +218,7 @@ class TreeReader {
 
     bool start_array(std::size_t /*size*/) {
         const Slot slot = next();
+        lookAtKind(JsonKind::list);
         switch (slot) {
             case Slot::property:
                 list_.clear();
@@ -257,6 +285,7 @@ class TreeReader {
                 property_ = *id;
                 return Slot::property;
             }
+            slips_.add(tokens_.start(), slipOfPropertyName(name));
         }
         if (object == Slot::node) {
             const auto* const known =
@@ -291,6 +320,81 @@ class TreeReader {
         return frames_.empty() ? Snapshot::none : frames_.back().node;
     }
     [[nodiscard]] ReadNode& node() { return nodes_[owner()]; }
+
+    /// Looks whether a value, or an entry of a list, is of its property's kind.
+    void lookAtKind(JsonKind found) {
+        const Slot slot = next();
+        if (slot == Slot::property) {
+            slips_.add(tokens_.start(), slipOfKind(property_, found));
+        } else if (slot == Slot::propertyEntry) {
+            slips_.add(tokens_.start(), slipOfEntry(property_, found));
+        }
+    }
+
+    /// Looks at a text that is the value of a property, or an entry of its list.
+    void lookAtText(const std::string& value) {
+        if (!isReadable(value)) {
+            slips_.add(tokens_.start(), "this machine tells no name to put in");
+        } else {
+            slips_.add(tokens_.start(), slipOfText(property_, expanded(value)));
+        }
+        if (property_ == NodeLexicon::Properties::Name && next() == Slot::property) {
+            node().nameAt = tokens_.start();
+        }
+    }
+
+    /// The name of a node; null when it has none.
+    static const std::string* nameOf(const ReadNode& node) {
+        for (const SnapshotProperty& property : node.properties) {
+            if (property.id == NodeLexicon::Properties::Name) {
+                return std::get_if<std::string>(&property.value);
+            }
+        }
+        return nullptr;
+    }
+
+    [[nodiscard]] const ReadNode* parentOf(const ReadNode* node) const {
+        return node == nullptr || node->parent == Snapshot::none ? nullptr : &nodes_[node->parent];
+    }
+
+    static bool isServiceProcessor(const ReadNode* computer) {
+        return computer != nullptr &&
+               computer->description == NodeLexicon::serviceProcessorDescription;
+    }
+
+    /// Looks for what only shows when the whole tree has been read.
+    void lookAtNodes() {
+        std::set<std::pair<bool, std::string_view>> interfaces;
+        for (const ReadNode& each : nodes_) {
+            const ReadNode* const parent = parentOf(&each);
+            slips_.add(each.typeAt, slipOfType(each.type, parent == nullptr ? std::string_view{}
+                                                                            : parent->type));
+            const std::string* const name = nameOf(each);
+            const auto type = NodeLexicon::nodeTypeOf(each.type);
+            if (name != nullptr && type == NodeLexicon::NodeType::NetworkInterface) {
+                const bool ofProcessor = isServiceProcessor(parentOf(parent));
+                if (!interfaces.emplace(ofProcessor, *name).second) {
+                    slips_.add(each.nameAt,
+                               "there is an interface \"" + *name +
+                                   "\" already: the instances of both have the same keys");
+                }
+            } else if (name != nullptr && type == NodeLexicon::NodeType::ComputerSystem &&
+                       !isServiceProcessor(&each) && !hostName_.empty() && *name != hostName_) {
+                slips_.add(each.nameAt, foreignName(*name));
+            }
+        }
+    }
+
+    /// What it means that a computer has another name than this machine: instances of
+    /// interfaces name this machine as their system, and only the computer itself is
+    /// called as its node is.
+    [[nodiscard]] std::string foreignName(const std::string& name) const {
+        return "the computer is called \"" + name + "\" and this machine \"" + hostName_ +
+               "\", which the instances of its interfaces name as their system: "
+               "QVXZR_HostedDHCPPoint and QVXZR_DHCPRemoteHostedAccessPoint have no instance "
+               "for it; \"" +
+               std::string(hostNameVariable) + "\" stands for the name of any machine";
+    }
 
     void set(PropertyValue value) {
         auto& properties = node().properties;
@@ -384,6 +488,7 @@ class TreeReader {
     }
 
     [[nodiscard]] std::shared_ptr<const Snapshot> snapshot() {
+        lookAtNodes();
         SnapshotBuilder builder;
         for (ReadNode& each : nodes_) {
             builder.add(each.parent, std::move(each.type), std::move(each.description));
@@ -393,12 +498,16 @@ class TreeReader {
                 builder.property(property.id, std::move(property.value), readOnly);
             }
         }
+        for (std::string& slip : slips_.told()) {
+            builder.diagnostic(Diagnostic{std::move(slip), Diagnostic::Kind::Note});
+        }
         return builder.build();
     }
 
     std::string_view text_;
     const std::string& hostName_;
     TokenTracker tokens_;
+    TreeSlips slips_;
 
     std::vector<ReadNode> nodes_;
     std::vector<Frame> frames_;
@@ -414,8 +523,8 @@ class TreeReader {
 
 }  // namespace
 
-JsonTree parseJsonTree(std::string_view text, const std::string& hostName) {
-    return TreeReader(text, hostName).read();
+JsonTree parseJsonTree(std::string_view text, const std::string& hostName, std::string_view name) {
+    return TreeReader(text, hostName, name).read();
 }
 
 }  // namespace ZR

@@ -27,6 +27,10 @@ using JsonTree = std::variant<std::shared_ptr<const Snapshot>, JsonTreeFault>;
 /// name (an empty one), a property with it is unreadable, and types and descriptions,
 /// which cannot be so, have nothing in its place. Nodes, and
 /// values that are not read, may be nested 64 levels deep. Throws std::bad_alloc only.
-[[nodiscard]] JsonTree parseJsonTree(std::string_view text, const std::string& hostName);
+///
+/// What can be read and is likely not what its author meant is told by the snapshot, as
+/// "NAME:LINE:COLUMN: ..." under the name given; without one it is not looked for.
+[[nodiscard]] JsonTree parseJsonTree(std::string_view text, const std::string& hostName,
+                                     std::string_view name = {});
 
 }  // namespace ZR

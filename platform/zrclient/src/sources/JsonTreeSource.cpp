@@ -8,6 +8,7 @@
 
 #include "sources/JsonTree.h"
 #include "tklogger/TKLogger.h"
+#include "zrclient/TreeFile.h"
 #include "zrcommon/Errno.h"
 #include "zrcommon/File.h"
 #include "zrcommon/LogLevel.h"
@@ -30,8 +31,8 @@ bool isOfTheFile(int error) {
 
 }  // namespace
 
-JsonTreeSource::JsonTreeSource(const std::string& path)
-    : watch_(path), empty_(SnapshotBuilder().build()) {}
+JsonTreeSource::JsonTreeSource(const std::string& path, std::string name)
+    : watch_(path), name_(std::move(name)), empty_(SnapshotBuilder().build()) {}
 
 bool JsonTreeSource::changed() {
     // No file tells when the machine gets a name.
@@ -47,7 +48,7 @@ std::shared_ptr<const Snapshot> JsonTreeSource::read() {
         // Out of memory, in the main: the machine shows nothing until there is some.
         readAgain_ = true;
         try {
-            report(watch_.path() + ": " + error.what());
+            return unusable(std::string(": ") + error.what());
         } catch (const std::exception&) {  // NOLINT(bugprone-empty-catch)
             // Without memory for a message there is none.
         }
@@ -60,16 +61,14 @@ std::shared_ptr<const Snapshot> JsonTreeSource::tryToRead() {
     if (!text) {
         const int reason = errno;
         readAgain_ = !isOfTheFile(reason);
-        report(watch_.path() + ": " + reasonOf(reason));
-        return empty_;
+        return unusable(": " + reasonOf(reason));
     }
     const SystemName system = readSystemName();
     nameless_ = system.name.empty();
-    JsonTree tree = parseJsonTree(*text, system.name);
+    JsonTree tree = parseJsonTree(*text, system.name, name_);
     if (const auto* fault = std::get_if<JsonTreeFault>(&tree)) {
-        report(watch_.path() + ":" + std::to_string(fault->line) + ":" +
-               std::to_string(fault->column) + ": " + fault->reason);
-        return empty_;
+        return unusable(":" + std::to_string(fault->line) + ":" + std::to_string(fault->column) +
+                        ": " + fault->reason);
     }
     if (nameless_) {
         report(system.diagnostic);
@@ -77,6 +76,13 @@ std::shared_ptr<const Snapshot> JsonTreeSource::tryToRead() {
         lastReported_.clear();
     }
     return std::get<std::shared_ptr<const Snapshot>>(std::move(tree));
+}
+
+std::shared_ptr<const Snapshot> JsonTreeSource::unusable(const std::string& reason) {
+    report(watch_.path() + reason);
+    SnapshotBuilder builder;
+    builder.diagnostic(Diagnostic{name_ + reason});
+    return builder.build();
 }
 
 void JsonTreeSource::report(const std::string& message) {
@@ -88,6 +94,10 @@ void JsonTreeSource::report(const std::string& message) {
     TKLog::TKLogger::logLevelMessage("zrclient/JsonTreeSource", "read", __LINE__,
                                      "ZR.Instrumentation", LogLevel::failure, nullptr, 0, 0,
                                      message);
+}
+
+std::unique_ptr<SnapshotSource> openTreeFile(const std::string& path, std::string name) {
+    return std::make_unique<JsonTreeSource>(path, std::move(name));
 }
 
 }  // namespace ZR

@@ -14,12 +14,15 @@ namespace ZR {
 struct PlatformSettings {
     static constexpr int defaultLevel = LogLevel::failure;
 
-    std::string dataDir;              ///< DATA_DIR; always ends with "/"
-    std::string instrumentationTree;  ///< INSTRUMENTATION_TREE; empty: the live machine
-    int logLevel = defaultLevel;      ///< LOG_LEVEL: lines of this level or above are kept
-    int traceLevel = defaultLevel;    ///< TRACE_LEVEL
-    std::string logSink = "syslog";   ///< LOG_SINK: none, stderr, syslog, file:PATH
-    std::string traceSink = "none";   ///< TRACE_SINK
+    /// The product's own: no shell and no network script reads what lies there.
+    static constexpr const char* defaultDataDir = "/var/lib/dhcp-client-provider/";
+
+    std::string dataDir = defaultDataDir;  ///< DATA_DIR; always ends with "/"
+    std::string instrumentationTree;       ///< INSTRUMENTATION_TREE; empty: the live machine
+    int logLevel = defaultLevel;           ///< LOG_LEVEL: lines of this level or above are kept
+    int traceLevel = defaultLevel;         ///< TRACE_LEVEL
+    std::string logSink = "syslog";        ///< LOG_SINK: none, stderr, syslog, file:PATH
+    std::string traceSink = "none";        ///< TRACE_SINK
 
     /// What could not be used, one text each with its file and line or its
     /// variable; the setting then has its default.
