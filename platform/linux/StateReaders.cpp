@@ -1,6 +1,9 @@
 #include "StateReaders.h"
 
+#include <sys/types.h>
+
 #include <array>
+#include <vector>
 
 #include "clients/Connman.h"
 #include "clients/Dhclient.h"
@@ -73,7 +76,16 @@ constexpr std::array readers{
 }  // namespace
 
 void readClientSockets(const Roots& roots, ClientFacts& facts) {
-    facts.sockets = readSockets(roots, facts.diagnostics);
+    std::vector<uid_t> users;
+    for (const ClientProcess& process : facts.processes) {
+        users.push_back(process.user);
+    }
+    for (const ManagerProcess& manager : facts.managers) {
+        if (manager.where != ManagerProcess::Where::Elsewhere) {
+            users.push_back(manager.user);
+        }
+    }
+    facts.sockets = readSockets(roots, facts.diagnostics, users);
 }
 
 std::span<const StateReader> stateReaders() noexcept {

@@ -35,6 +35,7 @@ struct ManagerProcess {
     Client client{};
     Where where = Where::Unknown;
     std::int32_t pid = 0;
+    std::uint32_t user = 0;  ///< effective user
 
     bool operator==(const ManagerProcess&) const = default;
 };

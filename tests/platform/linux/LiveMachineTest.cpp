@@ -466,6 +466,7 @@ TEST_F(LiveMachineTest, WhatTheKernelAskedForAtItsStart) {
 
 TEST_F(LiveMachineTest, AnAddressThatConnmanGotByDhcp) {
     root_.write("/proc/17/comm", "connmand\n");
+    root_.write("/proc/17/status", "State:\tS\nUid:\t0\t0\t0\t0\n");
     root_.write("/var/lib/connman/ethernet_5254_cable/settings",
                 "[ethernet_5254_cable]\nIPv4.method=dhcp\nIPv4.DHCP.LastAddress=192.0.2.1\n");
     LiveMachine& machine =
@@ -485,6 +486,7 @@ TEST_F(LiveMachineTest, BeforeItIsReadItCountsAsChanged) {
 
 TEST_F(LiveMachineTest, EveryPlaceThatItReadsIsWatched) {
     root_.write("/proc/17/comm", "dhclient\n");
+    root_.write("/proc/17/status", "State:\tS\nUid:\t0\t0\t0\t0\n");
     root_.write("/proc/17/cmdline", std::string{"dhclient\0-lf\0/srv/own.leases\0eth1\0", 34});
     for (const char* process : {"17", "thread-self"}) {
         std::filesystem::create_directories(root_.path("/proc/") + process + "/ns");
