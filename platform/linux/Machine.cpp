@@ -263,7 +263,8 @@ void Machine::collectSockets() {
     // it, and then no more than the process would, where that can be seen.
     const bool clientSeen =
         std::any_of(facts_.clients.processes.begin(), facts_.clients.processes.end(),
-                    [](const ClientProcess& process) { return !process.ipv6; });
+                    [](const ClientProcess& process) { return !process.ipv6; }) ||
+        facts_.clients.runs(Client::Dhcpcd);
     for (const PortSocket& socket : facts_.clients.sockets.bound) {
         if (socket.address) {
             for (const Holder& holder : holders(*socket.address)) {
