@@ -307,7 +307,10 @@ void bareReading(benchmark::State& state) {
                 }
             });
         }
-        readBare("/proc/thread-self/net/udp", buffer);
+        for (const char* file :
+             {"/proc/loadavg", "/proc/thread-self/net/udp", "/proc/thread-self/net/packet"}) {
+            readBare(file, buffer);
+        }
     }
 }
 

@@ -88,7 +88,7 @@ Standing settle(Lease& lease, const Address& address, std::int64_t now) noexcept
     const std::int64_t end = endOf(address, now);
     if (!lease.expires) {
         lease.expires = end;
-        return Standing::Live;
+        return standingBy(lease, now);
     }
     if (isEndless(lease, now)) {
         return Standing::Foreign;
@@ -96,11 +96,12 @@ Standing settle(Lease& lease, const Address& address, std::int64_t now) noexcept
     if (isNear(*lease.expires - end)) {
         return standingBy(lease, now);
     }
-    if (!lease.clientAlive && *lease.expires <= now) {
-        return Standing::Foreign;  // of another lease, or of no lease
+    if (!lease.clientAlive && *lease.expires < end) {
+        // Nothing renews a lease whose client is gone: the address may be another lease's.
+        return *lease.expires <= now ? Standing::Foreign : Standing::Live;
     }
     move(lease, end - *lease.expires);
-    return Standing::Live;
+    return standingBy(lease, now);
 }
 
 bool endsTogether(const Lease& lease, const Address& address, std::int64_t now) noexcept {

@@ -74,18 +74,11 @@ class ClaimedLinks {
     std::set<InterfaceName> names_;
 };
 
-/// Whether a client asks for leases of this family. dhcpcd asks for both at once.
-bool asksFor(const ClientProcess& process, bool ipv6) {
-    return process.ipv6 == ipv6 || (process.client == Client::Dhcpcd && !process.ipv6);
-}
-
 bool holdsLease(const ClientProcess& process, const InterfaceView& view) {
-    const auto isIts = [&](const Lease* lease) {
+    const auto& leases = process.ipv6 ? view.leases6 : view.leases;
+    return std::any_of(leases.begin(), leases.end(), [&](const Lease* lease) {
         return lease->clientAlive && lease->client == process.client;
-    };
-    return (asksFor(process, false) &&
-            std::any_of(view.leases.begin(), view.leases.end(), isIts)) ||
-           (asksFor(process, true) && std::any_of(view.leases6.begin(), view.leases6.end(), isIts));
+    });
 }
 
 /// Whether a client says itself what it does with a link, which its process cannot tell.

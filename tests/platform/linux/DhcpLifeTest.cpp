@@ -67,14 +67,19 @@ class Laboratory {
 
 class Watched {
   public:
-    PropertyValue operator[](Properties property) {
+    explicit Watched(std::string link = "eth1") : link_(std::move(link)) {}
+
+    PropertyValue operator[](Properties property) { return valueOf(tree(), link_, property); }
+
+    const Snapshot& tree() {
         if (source_->changed()) {
             tree_ = source_->read();
         }
-        return valueOf(*tree_, "eth1", property);
+        return *tree_;
     }
 
   private:
+    std::string link_;
     std::unique_ptr<SnapshotSource> source_ = openLiveSource();
     std::shared_ptr<const Snapshot> tree_;
 };
@@ -208,8 +213,58 @@ TEST(DhcpLife, AClientThatIsKilledLeavesItsLeaseAlive) {
         EXPECT_EQ(eth1[Properties::DHCPServerAddresses], PropertyValue{Servers{"198.51.100.1"}});
         run("ip addr flush dev eth1 scope global");
         EXPECT_EQ(eth1[Properties::DHCPServerAddresses], PropertyValue{Servers{}});
-        EXPECT_TRUE(eventually([&] { return eth1[Properties::AddressSource] == number(0); }));
+        EXPECT_EQ(eth1[Properties::AddressSource], number(0));
+        EXPECT_TRUE(eventually([&] {
+            return eth1[Properties::DHCPEnabled] == PropertyValue{false};
+        })) << "its end takes a moment";
+    }));
+}
+
+TEST(DhcpLife, ALinkThatIsRenamedUnderItsClientKeepsIt) {
+    ZR_NEEDS_NAMESPACES();
+    ZR_NEEDS_DHCP();
+    EXPECT_TRUE(passesInNamespaces(30, [] {
+        const Laboratory laboratory{"600s"};
+        start("");
+        run("ip link set eth1 name lan0");
+        Watched lan0{"lan0"};
+        EXPECT_EQ(lan0[Properties::DHCPEnabled], PropertyValue{true});
+        EXPECT_EQ(lan0[Properties::DHCPServerAddresses], PropertyValue{Servers{"198.51.100.1"}});
+        run("ip addr flush dev lan0 scope global");
+        EXPECT_EQ(lan0[Properties::DHCPServerAddresses], PropertyValue{Servers{}});
+        EXPECT_EQ(lan0[Properties::DHCPEnabled], PropertyValue{true}) << "it still listens";
+        EXPECT_EQ(lan0[Properties::AddressSource], number(0));
+        run("kill $(cat /run/client.pid)");
+        EXPECT_TRUE(
+            eventually([&] { return lan0[Properties::DHCPEnabled] == PropertyValue{false}; }));
+    }));
+}
+
+TEST(DhcpLife, AClientThatAsksInVainOnAContainersCableShowsWithinASecond) {
+    ZR_NEEDS_NAMESPACES();
+    if (::access("/usr/sbin/udhcpc", X_OK) != 0) {
+        GTEST_SKIP() << "needs udhcpc";
+    }
+    EXPECT_TRUE(passesInNamespaces(30, [] {
+        const OtherNamespace far;
+        run("echo 1 > /proc/sys/net/ipv6/conf/default/disable_ipv6");
+        run("ip link add eth1 type veth peer name far netns " + far.process());
+        run("ip link set eth1 up && nsenter --net=/proc/" + far.process() +
+            "/ns/net ip link set far up");
+        Watched eth1;
+        EXPECT_EQ(interfaceNames(eth1.tree()), std::vector<std::string>{"eth1"});
         EXPECT_EQ(eth1[Properties::DHCPEnabled], PropertyValue{false});
+        // It writes no file that tells of it.
+        run("udhcpc -i eth1 -f -s /bin/true < /dev/null > /dev/null 2>&1 & echo $! > /run/pid");
+        EXPECT_TRUE(
+            eventually([&] { return eth1[Properties::DHCPEnabled] == PropertyValue{true}; }));
+        EXPECT_EQ(eth1[Properties::AddressSource], number(0));
+        const auto lease = eth1.tree().first(NodeLexicon::NodeType::DHCPLease);
+        ASSERT_NE(lease, Snapshot::none);
+        EXPECT_EQ(eth1.tree().find(lease, Properties::Address), nullptr);
+        run("kill $(cat /run/pid)");
+        EXPECT_TRUE(
+            eventually([&] { return eth1[Properties::DHCPEnabled] == PropertyValue{false}; }));
     }));
 }
 

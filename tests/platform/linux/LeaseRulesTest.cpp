@@ -1,0 +1,136 @@
+#include "LeaseRules.h"
+
+#include <gtest/gtest.h>
+
+#include "LinuxSupport.h"
+
+namespace ZR::Live {
+namespace {
+
+constexpr std::int64_t now = 1'800'000'000;
+constexpr std::int64_t year = std::int64_t{365} * 24 * 3600;
+
+Lease leaseOf(Client client, std::optional<std::int64_t> expires) {
+    return {.client = client,
+            .interfaceName = "eth0"_name,
+            .address = "192.0.2.7"_ip,
+            .server = {},
+            .expires = expires};
+}
+
+Address addressFor(std::uint32_t seconds) {
+    return {.ifindex = 2, .ip = "192.0.2.7"_ip, .validLifetime = seconds};
+}
+
+Standing standingOf(Lease lease, std::uint32_t seconds) {
+    return settle(lease, addressFor(seconds), now);
+}
+
+TEST(LeaseRules, ALeaseStandsUntilItsEnd) {
+    EXPECT_EQ(standingOf(leaseOf(Client::Dhclient, now + 1), 1), Standing::Live);
+    EXPECT_EQ(standingOf(leaseOf(Client::Dhclient, now), 0), Standing::Ended);
+    EXPECT_EQ(standingOf(leaseOf(Client::Udhcpc, now + 1), Address::infinite), Standing::Live);
+    EXPECT_EQ(standingOf(leaseOf(Client::Udhcpc, now), Address::infinite), Standing::Ended);
+}
+
+TEST(LeaseRules, AnAddressWithoutAnEndIsNotThatOfALeaseWithOne) {
+    EXPECT_EQ(standingOf(leaseOf(Client::Networkd, now + 600), Address::infinite),
+              Standing::Foreign);
+    Lease lease = leaseOf(Client::Dhclient, now + 600);
+    lease.clientAlive = true;
+    EXPECT_EQ(standingOf(lease, Address::infinite), Standing::Foreign);
+    lease.bootp = true;
+    EXPECT_EQ(standingOf(lease, Address::infinite), Standing::Live);
+    lease.bootp = false;
+    lease.outlivesEnd = true;
+    EXPECT_EQ(standingOf(lease, Address::infinite), Standing::Live);
+}
+
+TEST(LeaseRules, AnAddressWithAnEndIsNotThatOfALeaseWithoutOne) {
+    EXPECT_EQ(standingOf(leaseOf(Client::Dhclient, Lease::never), 600), Standing::Foreign);
+    EXPECT_EQ(standingOf(leaseOf(Client::Dhclient, now + 136 * year), 600), Standing::Foreign);
+    EXPECT_EQ(standingOf(leaseOf(Client::Dhclient, now + 136 * year), Address::infinite),
+              Standing::Live);
+}
+
+TEST(LeaseRules, WithoutAKnownEndTheAddressTellsIt) {
+    Lease lease = leaseOf(Client::Networkd, std::nullopt);
+    EXPECT_EQ(settle(lease, addressFor(600), now), Standing::Live);
+    EXPECT_EQ(lease.expires, now + 600);
+    EXPECT_EQ(standingOf(leaseOf(Client::Networkd, std::nullopt), Address::infinite),
+              Standing::Foreign);
+    lease = leaseOf(Client::Networkd, std::nullopt);
+    lease.clientAlive = true;
+    EXPECT_EQ(settle(lease, addressFor(Address::infinite), now), Standing::Live);
+    EXPECT_EQ(lease.expires, std::nullopt);
+}
+
+TEST(LeaseRules, AfterTheClockWasSetAllTimesMoveToTheKernels) {
+    for (const std::int64_t by : {-5 * year, std::int64_t{-11}, std::int64_t{11}, 5 * year}) {
+        Lease lease = leaseOf(Client::Dhclient, now + 300 + by);
+        lease.clientAlive = true;
+        lease.obtained = now - 300 + by;
+        lease.renews = now + by;
+        lease.rebinds = now + 225 + by;
+        EXPECT_EQ(settle(lease, addressFor(300), now), Standing::Live) << by;
+        EXPECT_EQ(lease.expires, now + 300) << by;
+        EXPECT_EQ(lease.obtained, now - 300) << by;
+        EXPECT_EQ(lease.renews, now) << by;
+        EXPECT_EQ(lease.rebinds, now + 225) << by;
+    }
+    Lease over = leaseOf(Client::Dhclient, now + year);
+    EXPECT_EQ(settle(over, addressFor(0), now), Standing::Ended) << "the kernel is taking it away";
+    Lease near = leaseOf(Client::Dhclient, now + 310);
+    EXPECT_EQ(settle(near, addressFor(300), now), Standing::Live);
+    EXPECT_EQ(near.expires, now + 310) << "the client's own word is the finer one";
+}
+
+TEST(LeaseRules, AnOldLeaseOfAClientThatIsGoneIsNotThatOfANewAddress) {
+    EXPECT_EQ(standingOf(leaseOf(Client::Dhclient, now - year), 300), Standing::Foreign);
+    Lease lease = leaseOf(Client::Dhclient, now + 1);
+    EXPECT_EQ(settle(lease, addressFor(300), now), Standing::Live);
+    EXPECT_EQ(lease.expires, now + 1) << "it does not last longer";
+    lease.expires = now + year;
+    EXPECT_EQ(settle(lease, addressFor(300), now), Standing::Live);
+    EXPECT_EQ(lease.expires, now + 300);
+}
+
+TEST(LeaseRules, TimesThatNoClockShowsAreTakenOut) {
+    constexpr std::int64_t least = std::numeric_limits<std::int64_t>::min();
+    constexpr std::int64_t most = std::numeric_limits<std::int64_t>::max();
+    Lease lease = leaseOf(Client::Dhclient, least);
+    lease.clientAlive = true;
+    lease.obtained = least;
+    lease.renews = most;
+    lease.rebinds = most;
+    EXPECT_EQ(settle(lease, addressFor(300), now), Standing::Live);
+    EXPECT_EQ(lease.expires, now + 300);
+    EXPECT_EQ(lease.obtained, std::nullopt);
+    EXPECT_EQ(lease.renews, std::nullopt);
+    EXPECT_EQ(lease.rebinds, std::nullopt);
+    lease.expires = most - 1;
+    EXPECT_EQ(settle(lease, addressFor(Address::infinite), now), Standing::Live);
+    EXPECT_TRUE(isEndless(lease, now));
+    EXPECT_FALSE(endsTogether(leaseOf(Client::Dhclient, least), addressFor(300), now));
+}
+
+TEST(LeaseRules, ALeaseAndItsAddressEndTogether) {
+    EXPECT_TRUE(endsTogether(leaseOf(Client::Dhclient, now + 310), addressFor(300), now));
+    EXPECT_FALSE(endsTogether(leaseOf(Client::Dhclient, now + 311), addressFor(300), now));
+    EXPECT_FALSE(endsTogether(leaseOf(Client::Dhclient, std::nullopt), addressFor(300), now));
+    EXPECT_FALSE(endsTogether(leaseOf(Client::Dhclient, Lease::never), addressFor(300), now));
+    Lease endless = leaseOf(Client::Dhclient, Lease::never);
+    EXPECT_FALSE(endsTogether(endless, addressFor(Address::infinite), now));
+    endless.clientAlive = true;
+    EXPECT_TRUE(endsTogether(endless, addressFor(Address::infinite), now));
+}
+
+TEST(LeaseRules, WickedsAddressesAreItsOwnWhileItRuns) {
+    Lease lease = leaseOf(Client::Wicked, now + 600);
+    EXPECT_EQ(standingOf(lease, Address::infinite), Standing::Foreign);
+    lease.clientAlive = true;
+    EXPECT_EQ(standingOf(lease, Address::infinite), Standing::Live);
+}
+
+}  // namespace
+}  // namespace ZR::Live
