@@ -4,6 +4,7 @@
 
 #include "formats/Files.h"
 #include "formats/KeyFile.h"
+#include "formats/Trust.h"
 
 namespace ZR::Live {
 namespace {
@@ -34,7 +35,7 @@ void readConnman(const Roots& roots, ClientFacts& facts) {
         const std::string ofService = pathIn(directory, service);
         // Other files stand beside the services' directories.
         std::string path = pathIn(ofService, settingsName);
-        const auto text = readOptionalFile(path, facts.diagnostics);
+        const auto text = readTrustedFile(path, {}, facts.diagnostics);
         if (!text) {
             continue;
         }

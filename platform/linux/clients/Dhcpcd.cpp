@@ -14,6 +14,7 @@
 #include "formats/DhcpPacket.h"
 #include "formats/Files.h"
 #include "formats/Numbers.h"
+#include "formats/Trust.h"
 #include "zrcommon/File.h"
 
 namespace ZR::Live {
@@ -70,6 +71,11 @@ struct LeaseFile {
 class LeaseFiles {
   public:
     LeaseFiles(const Roots& roots, ClientFacts& facts) : facts_(facts) {
+        for (const ClientProcess& process : facts.processes) {
+            if (process.client == Client::Dhcpcd) {
+                writers_.push_back(process.user);
+            }
+        }
         for (const DhcpcdDirectory& place : dhcpcdDirectories) {
             readPlace(roots.path(place.path), place.namePrefix);
         }
@@ -114,7 +120,9 @@ class LeaseFiles {
             LeaseFile file{.path = pathIn(directory, name),
                            .interfaces = dhcpcdInterfaces(stem),
                            .ipv6 = ipv6};
-            if (const auto written = timeOf(file.path)) {  // else it is gone meanwhile
+            const bool trusted = isTrusted(file.path, writers_, facts_.diagnostics);
+            const auto written = trusted ? timeOf(file.path) : std::nullopt;
+            if (written) {  // else it is gone meanwhile
                 file.written = *written;
                 readFile(file);
                 files_.push_back(std::move(file));
@@ -198,6 +206,7 @@ class LeaseFiles {
     }
 
     ClientFacts& facts_;
+    std::vector<uid_t> writers_;
     std::vector<LeaseFile> files_;
     std::vector<Lease> leases_;
 };
@@ -314,7 +323,7 @@ class Daemon {
         const auto started = startTime();
         // What was written since it started may not be read yet.
         if (written && (!started || *written <= *started)) {
-            text_ = readOptionalFile(path, facts_.diagnostics).value_or("");
+            text_ = readTrustedFile(path, {}, facts_.diagnostics).value_or("");
         }
         configuration_ = path;
     }
@@ -455,8 +464,10 @@ void replaceProcesses(const Roots& roots, const LeaseFiles& files, ClientFacts& 
     facts.processes.erase(first, facts.processes.end());
     for (ClientProcess& process : found) {
         // Its sockets are known to have an owner, on whatever links it asks.
-        facts.managers.push_back(
-            {.client = Client::Dhcpcd, .where = ManagerProcess::Where::Here, .pid = process.pid});
+        facts.managers.push_back({.client = Client::Dhcpcd,
+                                  .where = ManagerProcess::Where::Here,
+                                  .pid = process.pid,
+                                  .user = process.user});
         Daemon{roots, std::move(process), facts}.addTo(files);
     }
 }

@@ -11,6 +11,7 @@
 #include "formats/KeyFile.h"
 #include "formats/NetworkdLease.h"
 #include "formats/Numbers.h"
+#include "formats/Trust.h"
 
 namespace ZR::Live {
 namespace {
@@ -59,7 +60,7 @@ std::vector<ProfileFile> readProfiles(const Roots& roots, ClientFacts& facts) {
         const std::string place = roots.path(directory);
         for (const std::string& name : listOptionalDirectory(place, facts.diagnostics)) {
             std::string path = pathIn(place, name);
-            if (const auto text = readOptionalFile(path, facts.diagnostics)) {
+            if (const auto text = readTrustedFile(path, {}, facts.diagnostics)) {
                 const std::int64_t written = timeOf(path);
                 profiles.push_back({.path = std::move(path),
                                     .written = written,
@@ -120,7 +121,7 @@ void readDevices(const Roots& roots, const std::vector<ProfileFile>& profiles, C
     for (const std::string& name : listOptionalDirectory(devices, facts.diagnostics)) {
         const auto ifindex = parseNumber<std::uint32_t>(name);
         const std::string path = pathIn(devices, name);
-        const auto text = ifindex ? readOptionalFile(path, facts.diagnostics) : std::nullopt;
+        const auto text = ifindex ? readTrustedFile(path, {}, facts.diagnostics) : std::nullopt;
         if (!text) {
             continue;
         }
@@ -152,7 +153,7 @@ void readInternalLeases(const Roots& roots, ClientFacts& facts) {
         if (!interface || ::stat(path.c_str(), &status) != 0) {
             continue;
         }
-        const auto text = readOptionalFile(path, facts.diagnostics);
+        const auto text = readTrustedFile(path, {}, facts.diagnostics);
         const NetworkdLease lease = parseNetworkdLease(text.value_or(""));
         if (!lease.address || !lease.lifetime) {
             continue;

@@ -6,8 +6,8 @@
 #include <cstdint>
 #include <string_view>
 
+#include "clients/DhclientOptions.h"
 #include "formats/Numbers.h"
-#include "formats/OptionNames.h"
 
 namespace ZR::Live {
 namespace {
@@ -32,9 +32,34 @@ Time after(const Time& start, const Time& seconds) {
     return *seconds >= UINT32_MAX ? Lease::never : *start + *seconds;
 }
 
+/// The code of an option: they have the names of dhclient, with other signs between words.
+std::optional<std::uint16_t> codeOf4(std::string name) {
+    if (name == "dhcp_client_identifier") {
+        return std::nullopt;  // what the client sent
+    }
+    std::replace(name.begin(), name.end(), '_', '-');
+    return dhclientOptionCode(name);
+}
+std::optional<std::uint16_t> codeOf6(std::string name) {
+    constexpr std::string_view prefix = "dhcp6_";
+    constexpr std::uint16_t association = 3;  // IA_NA
+    constexpr std::uint16_t hostName = 39;
+    if (name == "iaid") {
+        return association;
+    }
+    if (name == "fqdn_fqdn") {
+        return hostName;
+    }
+    if (!name.starts_with(prefix)) {
+        return std::nullopt;
+    }
+    std::replace(name.begin(), name.end(), '_', '-');
+    name[prefix.size() - 1] = '.';
+    return dhclientOptionCode6(name);
+}
+
 void addCodes(const NetworkManagerOptions& options,
-              std::optional<std::uint16_t> (*codeOf)(std::string_view name) noexcept,
-              Lease& lease) {
+              std::optional<std::uint16_t> (*codeOf)(std::string name), Lease& lease) {
     for (const auto& [name, value] : options) {
         if (const auto code = codeOf(name)) {
             lease.options.push_back(*code);
@@ -66,7 +91,7 @@ std::optional<Lease> networkManagerLease4(const NetworkManagerOptions& options) 
         lease.renews = after(lease.obtained, numberOf(options, "dhcp_renewal_time"));
         lease.rebinds = after(lease.obtained, numberOf(options, "dhcp_rebinding_time"));
     }
-    addCodes(options, optionCode4, lease);
+    addCodes(options, codeOf4, lease);
     return lease;
 }
 
@@ -86,7 +111,7 @@ std::optional<Lease> networkManagerLease6(const NetworkManagerOptions& options) 
                 .renews = after(start, numberOf(options, "renew")),
                 .rebinds = after(start, numberOf(options, "rebind")),
                 .clientIdentifier = std::string{textOf(options, "dhcp6_client_id")}};
-    addCodes(options, optionCode6, lease);
+    addCodes(options, codeOf6, lease);
     return lease;
 }
 

@@ -6,7 +6,9 @@
 #include <cstddef>
 #include <cstdint>
 #include <map>
+#include <span>
 #include <utility>
+#include <vector>
 
 #include "clients/Managers.h"
 #include "formats/Files.h"
@@ -14,6 +16,7 @@
 #include "formats/NetworkdLease.h"
 #include "formats/Numbers.h"
 #include "formats/TimeSpan.h"
+#include "formats/Trust.h"
 #include "zrcommon/PropertyFile.h"
 
 namespace ZR::Live {
@@ -59,14 +62,14 @@ class NetworkFiles {
         }
         const std::string_view name = std::string_view{path}.substr(slash + 1);
         watch(std::string_view{path}.substr(0, std::max<std::size_t>(slash, 1)), name);
-        const auto text = readOptionalFile(roots_.path(path), facts_.diagnostics);
+        const auto text = readTrustedFile(roots_.path(path), {}, facts_.diagnostics);
         if (!text) {
             return std::nullopt;
         }
         Found found{.settings = {}, .written = timeOf(roots_.path(path))};
         applyNetworkFile(*text, found.settings);
         for (const auto& [dropIn, file] : dropIns(name)) {
-            if (const auto more = readOptionalFile(file, facts_.diagnostics)) {
+            if (const auto more = readTrustedFile(file, {}, facts_.diagnostics)) {
                 applyNetworkFile(*more, found.settings);
                 found.written = std::max(found.written, timeOf(file));
             }
@@ -100,6 +103,15 @@ class NetworkFiles {
     std::map<std::string, std::optional<Found>> read_;
 };
 
+/// The user as whom networkd runs, or ran: root, who alone can have made its directory in
+/// /run/systemd, has given it to that one.
+std::vector<uid_t> writersOf(const Roots& roots) {
+    struct stat status {};
+    return ::stat(roots.path(networkdStateDirectory).c_str(), &status) == 0
+               ? std::vector<uid_t>{status.st_uid}
+               : std::vector<uid_t>{};
+}
+
 void tellDamage(const std::string& path, const std::string& damage, ClientFacts& facts) {
     facts.diagnostics.emplace_back("cannot use all of " + path + ": " + damage,
                                    Diagnostic::Kind::Damaged);
@@ -107,9 +119,9 @@ void tellDamage(const std::string& path, const std::string& damage, ClientFacts&
 
 /// What networkd says of one link in its state file, and of how it was told to configure it.
 std::optional<LinkConfiguration> readLink(const Roots& roots, const std::string& path,
-                                          std::uint32_t ifindex, NetworkFiles& files,
-                                          ClientFacts& facts) {
-    const auto text = readOptionalFile(path, facts.diagnostics);
+                                          std::uint32_t ifindex, std::span<const uid_t> writers,
+                                          NetworkFiles& files, ClientFacts& facts) {
+    const auto text = readTrustedFile(path, writers, facts.diagnostics);
     if (!text) {
         return std::nullopt;
     }
@@ -164,6 +176,7 @@ NetworkdLink parseNetworkdLink(std::string_view text) {
 }
 
 void readNetworkd(const Roots& roots, ClientFacts& facts) {
+    const std::vector<uid_t> writers = writersOf(roots);
     NetworkFiles files{roots, facts};
     const std::string links = roots.path(networkdLinksDirectory);
     const std::string leases = roots.path(networkdLeasesDirectory);
@@ -174,8 +187,8 @@ void readNetworkd(const Roots& roots, ClientFacts& facts) {
     std::vector<std::uint32_t> managed;
     for (const std::string& name : listOptionalDirectory(links, facts.diagnostics)) {
         const auto ifindex = parseNumber<std::uint32_t>(name);
-        auto found =
-            ifindex ? readLink(roots, pathIn(links, name), *ifindex, files, facts) : std::nullopt;
+        auto found = ifindex ? readLink(roots, pathIn(links, name), *ifindex, writers, files, facts)
+                             : std::nullopt;
         if (found) {
             managed.push_back(*ifindex);
             (alive ? facts.managements : facts.configurations).push_back(*std::move(found));
@@ -184,7 +197,8 @@ void readNetworkd(const Roots& roots, ClientFacts& facts) {
     for (const std::string& name : listOptionalDirectory(leases, facts.diagnostics)) {
         const auto ifindex = parseNumber<std::uint32_t>(name);
         const std::string path = pathIn(leases, name);
-        const auto text = ifindex ? readOptionalFile(path, facts.diagnostics) : std::nullopt;
+        const auto text =
+            ifindex ? readTrustedFile(path, writers, facts.diagnostics) : std::nullopt;
         if (!text) {
             continue;
         }

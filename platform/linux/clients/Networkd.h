@@ -9,6 +9,7 @@
 
 namespace ZR::Live {
 
+inline constexpr std::string_view networkdStateDirectory = "/run/systemd/netif";
 inline constexpr std::string_view networkdLinksDirectory = "/run/systemd/netif/links";
 inline constexpr std::string_view networkdLeasesDirectory = "/run/systemd/netif/leases";
 

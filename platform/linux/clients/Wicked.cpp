@@ -11,6 +11,7 @@
 #include "formats/Files.h"
 #include "formats/InterfaceName.h"
 #include "formats/Numbers.h"
+#include "formats/Trust.h"
 #include "zrcommon/Strings.h"
 
 namespace ZR::Live {
@@ -234,7 +235,8 @@ void readWicked(const Roots& roots, ClientFacts& facts) {
         for (const std::string& name : listOptionalDirectory(directory, facts.diagnostics)) {
             const auto interface = interfaceOf(name);
             const std::string path = pathIn(directory, name);
-            const auto text = interface ? readOptionalFile(path, facts.diagnostics) : std::nullopt;
+            const auto text =
+                interface ? readTrustedFile(path, {}, facts.diagnostics) : std::nullopt;
             if (!text) {
                 continue;
             }

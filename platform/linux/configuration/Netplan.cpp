@@ -6,6 +6,7 @@
 #include "formats/Files.h"
 #include "formats/InterfaceName.h"
 #include "formats/NetworkFile.h"
+#include "formats/Trust.h"
 
 namespace ZR::Live {
 
@@ -16,7 +17,7 @@ void readNetplan(const Roots& roots, ClientFacts& facts) {
             continue;
         }
         std::string path = pathIn(directory, name);
-        const auto text = readOptionalFile(path, facts.diagnostics);
+        const auto text = readTrustedFile(path, {}, facts.diagnostics);
         if (!text) {
             continue;
         }

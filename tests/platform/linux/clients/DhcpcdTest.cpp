@@ -189,6 +189,17 @@ TEST_F(DhcpcdTest, AWirelessLeaseIsClaimedForEachPossibleInterface) {
     EXPECT_THAT(names, ElementsAre("wlan0-Net"_name, "wlan0"_name));
 }
 
+TEST_F(DhcpcdTest, AFileThatOthersCouldHaveWrittenIsNotBelieved) {
+    write("/var/lib/dhcpcd/eth1.lease", sample("dhcpcd-10/eth1.lease"));
+    std::filesystem::permissions(root_.path("/var/lib/dhcpcd/eth1.lease"),
+                                 std::filesystem::perms::others_write,
+                                 std::filesystem::perm_options::add);
+    const ClientFacts facts = read();
+    EXPECT_THAT(facts.leases, IsEmpty());
+    ASSERT_EQ(facts.diagnostics.size(), 1U);
+    EXPECT_EQ(facts.diagnostics[0].kind, Diagnostic::Kind::Untrusted);
+}
+
 /// A machine on which dhcpcd runs, as its processes and its file say.
 class RunningDhcpcdTest : public DhcpcdTest {
   protected:

@@ -277,5 +277,16 @@ TEST_F(NetworkManagerTest, FilesThatAreNotDevicesAreNotLookedAt) {
     EXPECT_THAT(read().managements, IsEmpty());
 }
 
+TEST_F(NetworkManagerTest, AFileThatOthersCouldHaveWrittenIsNotBelieved) {
+    root_.write(state, sample("networkmanager-internal/run-NetworkManager-devices-2.txt"));
+    std::filesystem::permissions(root_.path("/run/NetworkManager/devices/2"),
+                                 std::filesystem::perms::others_write,
+                                 std::filesystem::perm_options::add);
+    const ClientFacts facts = read();
+    EXPECT_THAT(facts.leases, IsEmpty());
+    ASSERT_EQ(facts.diagnostics.size(), 1U);
+    EXPECT_EQ(facts.diagnostics[0].kind, Diagnostic::Kind::Untrusted);
+}
+
 }  // namespace
 }  // namespace ZR::Live

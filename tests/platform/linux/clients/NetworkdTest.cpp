@@ -206,5 +206,16 @@ TEST_F(NetworkdTest, ANetworkFileThatIsNotAFileIsReported) {
     EXPECT_EQ(read().diagnostics.size(), 1U);
 }
 
+TEST_F(NetworkdTest, AFileThatOthersCouldHaveWrittenIsNotBelieved) {
+    root_.write("/run/systemd/netif/leases/2", sample("networkd/run-systemd-netif-leases-2.txt"));
+    std::filesystem::permissions(root_.path("/run/systemd/netif/leases/2"),
+                                 std::filesystem::perms::others_write,
+                                 std::filesystem::perm_options::add);
+    const ClientFacts facts = read();
+    EXPECT_THAT(facts.leases, IsEmpty());
+    ASSERT_EQ(facts.diagnostics.size(), 1U);
+    EXPECT_EQ(facts.diagnostics[0].kind, Diagnostic::Kind::Untrusted);
+}
+
 }  // namespace
 }  // namespace ZR::Live

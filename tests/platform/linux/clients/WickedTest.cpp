@@ -189,5 +189,16 @@ TEST_F(WickedTest, ATornFileIsReportedAndOthersAreNotLookedAt) {
                 ElementsAre(HasSubstr("the file ends within an element")));
 }
 
+TEST_F(WickedTest, AFileThatOthersCouldHaveWrittenIsNotBelieved) {
+    root_.write(file, lease4);
+    std::filesystem::permissions(root_.path("/var/lib/wicked/lease-eth1-dhcp-ipv4.xml"),
+                                 std::filesystem::perms::others_write,
+                                 std::filesystem::perm_options::add);
+    const ClientFacts facts = read();
+    EXPECT_THAT(facts.leases, IsEmpty());
+    ASSERT_EQ(facts.diagnostics.size(), 1U);
+    EXPECT_EQ(facts.diagnostics[0].kind, Diagnostic::Kind::Untrusted);
+}
+
 }  // namespace
 }  // namespace ZR::Live
