@@ -41,6 +41,12 @@ Response noSuchProperty(const cimom::ClassDeclaration& declaration, const std::s
     return response;
 }
 
+template <typename Values>
+auto find(Values& values, const std::string& name) {
+    return std::find_if(values.begin(), values.end(),
+                        [&](const auto& each) { return cimom::sameName(each.name, name); });
+}
+
 bool isConfigurationName(const cimom::ClassDeclaration& declaration, std::string_view property) {
     return cimom::sameName(declaration.name, settingClass) &&
            cimom::sameName(property, nameProperty);
@@ -75,10 +81,7 @@ Assignments readAssignments(const ModifyCommand& command, const std::string& cla
     std::string unwritable;
     for (const std::string& assignment : command.assignments) {
         const auto [name, value] = splitAssignment(assignment);
-        const bool twice =
-            std::any_of(result.values.begin(), result.values.end(),
-                        [&](const auto& each) { return cimom::sameName(each.name, name); });
-        if (twice) {
+        if (find(result.values, name) != result.values.end()) {
             throw Failure(ExitStatus::usage, printable(name) + " is given twice");
         }
         if (declaration == nullptr) {
@@ -131,9 +134,7 @@ cimom::Instance get(const cimom::ObjectPath& path, Client& client) {
 }
 
 void put(cimom::Instance& instance, const cimom::NamedValue& value) {
-    const auto found =
-        std::find_if(instance.properties.begin(), instance.properties.end(),
-                     [&](const auto& each) { return cimom::sameName(each.name, value.name); });
+    const auto found = find(instance.properties, value.name);
     if (found == instance.properties.end()) {
         instance.properties.push_back(value);
     } else {

@@ -117,6 +117,9 @@ void prepareFile(const RenameCommand& command, RenameReport& report) {
                                                    " has no configuration file: there is no " +
                                                    printable(report.file) + "; --create makes it");
         }
+        refuse(refusalsOfName(report.interfaceName),
+               "the file's first line would be DEVICE=" + printable(report.interfaceName) + ": ",
+               command);
         report.directoryCreated = createDataDirectory(report.dataDir);
         createConfigurationFile(report.file, report.interfaceName, command.name);
         report.fileCreated = true;
