@@ -133,6 +133,16 @@ cimom::Instance get(const cimom::ObjectPath& path, Client& client) {
     throw Failure(ExitStatus::notDone, "the response to GetInstance has no instance");
 }
 
+cimom::Instance readBack(const cimom::ObjectPath& path, Client& client) {
+    try {
+        return get(path, client);
+    } catch (const Failure& failure) {
+        throw Failure(failure.status(),
+                      std::string(failure.what()) +
+                          "; what came of the change is not known, as it cannot be read back");
+    }
+}
+
 void put(cimom::Instance& instance, const cimom::NamedValue& value) {
     const auto found = find(instance.properties, value.name);
     if (found == instance.properties.end()) {
@@ -205,7 +215,7 @@ CimOperation carryOut(const ModifyCommand& command, Client& client) {
     }
     CimOperation operation{path, client.modify(instance, names)};
     if (operation.response.status.ok()) {
-        compare(assignments.values, before, get(path, client));
+        compare(assignments.values, before, readBack(path, client));
     }
     return operation;
 }

@@ -149,6 +149,20 @@ TEST(ModifyRequest, TellsWhatIsOtherThanWanted) {
               "not changed as wanted: Label is now \"new\"; Place is now not set, not \"attic\"");
 }
 
+TEST(ModifyRequest, TellsThatTheChangeCannotBeReadBack) {
+    class Gone : public Shelf {
+      public:
+        Response modify(const cimom::Instance& changed,
+                        const std::vector<std::string>& properties) override {
+            Response response = Shelf::modify(changed, properties);
+            instance.path.keys.clear();
+            return response;
+        }
+    } shelf;
+    EXPECT_EQ(refusal(shelf, {"Label=new"}),
+              "status 6; what came of the change is not known, as it cannot be read back");
+}
+
 TEST(ModifyRequest, IsNotSentForWhatCannotBeWritten) {
     Shelf shelf;
     EXPECT_EQ(refusal(shelf, {"Label=new", "Maker=me", "Id=2"}),
