@@ -20,6 +20,7 @@
 #include "Lindows/DHCPRemoteAccessAvailableToElement.h"
 #include "Lindows/ElementCapabilities.h"
 #include "Lindows/SAPSAPDependency.h"
+#include "cimom/Instance.h"
 #include "kit/Host.h"
 #include "zrclient/Moniker.h"
 #include "zrcommon/SystemName.h"

@@ -13,6 +13,7 @@
 #include <vector>
 
 #include "BenchmarkMachine.h"
+#include "cimom/Instance.h"
 #include "include/TracePoint.h"
 #include "kit/Host.h"
 #include "kit/LogCapture.h"

@@ -17,6 +17,7 @@
 
 #include "BenchmarkMachine.h"
 #include "cimom/ObjectManager.h"
+#include "cimom/Results.h"
 
 namespace {
 

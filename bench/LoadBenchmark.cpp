@@ -20,6 +20,7 @@
 
 #include "OwnMachine.h"
 #include "cimom/ObjectManager.h"
+#include "cimom/Results.h"
 
 namespace {
 

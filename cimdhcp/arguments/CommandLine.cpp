@@ -8,6 +8,7 @@
 #include "arguments/HelpFormatter.h"
 #include "arguments/OptionGroups.h"
 #include "arguments/OptionRules.h"
+#include "client/InterfaceState.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
 
@@ -55,6 +56,38 @@ CIMDHCP_REGISTRATION_DIR and CIMDHCP_PROVIDER_DIR names others.
 
 "cimdhcp COMMAND --help" explains a command. The options above may stand
 before or behind the command.)";
+
+constexpr const char* checkHelp = R"(Each line begins with "ok", with "note" (worth a look) or with "BAD" (wrong); an arrow below
+it shows the remedy.
+
+Exit status:
+  0  nothing is wrong, though there may be notes
+  1  something is wrong
+  2  the command line cannot be understood
+  3  the output cannot be written)";
+
+std::string showHelp() {
+    constexpr std::size_t wordWidth = 11;
+    std::string text = "STATE is that of the interface's DHCP client:\n";
+    for (const StateWord& each : stateWords) {
+        std::string word(each.word);
+        word.resize(wordWidth, ' ');
+        text += "  " + word + std::string(each.meaning) + '\n';
+    }
+    return text + R"(
+CLIENT is the program that has the lease or asks for one, ADDRESS the IPv4 address or
+else that of a DHCPv6 lease, EXPIRES when the lease ends. Of several leases, the table
+has one: IPv4 comes first. "-" is what there is not, "?" what is not known; notes on
+standard error tell why, and what else is not as it looks. A WBEM server tells neither
+clients nor the ends of leases.
+
+With --format json, what there is not and what is not known are null; "unknown" lists
+the names of the latter. Moments have "seconds" since 1970 and "time" (UTC), and a lease
+without an end has the last second of the year 9999. "leases" has all leases with all
+that is known of them; of one that is asked for, the address is null.
+
+Exit status: that of every command; notes do not change it.)";
+}
 
 constexpr const char* machineGroup = "The machine";
 constexpr const char* classGroup = "Classes and instances";
@@ -224,7 +257,8 @@ class CommandLineReader::Parser {
 
     void addMachineCommands() {
         command("show", machineGroup, "The network interfaces and their DHCP clients",
-                records_.show);
+                records_.show)
+            ->footer(showHelp());
         CLI::App* const rename = command(
             "rename", machineGroup, "Change an interface's configuration name", records_.rename);
         rename
@@ -293,7 +327,8 @@ class CommandLineReader::Parser {
         CLI::App* const serve =
             command("serve", serverGroup, "Serve WBEM clients: CIM-XML over HTTP", records_.serve);
         command("check", serverGroup, "Tell why something is empty or does not work",
-                records_.check);
+                records_.check)
+            ->footer(checkHelp);
         addServeOptions(*serve, records_.serve);
         CLI::App* const user = app_.add_subcommand("user", "The users of the server");
         user->group(serverGroup)->require_subcommand(1);

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <string_view>
 
+#include "cimom/ClassDeclaration.h"
 #include "cimom/ObjectPathText.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"

@@ -2,7 +2,7 @@
 
 #include <string>
 
-#include "cimom/ObjectPath.h"
+#include "cimom/Forward.h"
 #include "client/ClassLookup.h"
 
 namespace cimdhcp {

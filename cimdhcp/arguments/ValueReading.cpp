@@ -9,6 +9,7 @@
 #include <string>
 #include <system_error>
 
+#include "cimom/ClassDeclaration.h"
 #include "cimom/Names.h"
 #include "cimom/ObjectPathText.h"
 #include "text/DisplayText.h"

@@ -2,7 +2,7 @@
 
 #include <string_view>
 
-#include "cimom/ClassRepository.h"
+#include "cimom/Forward.h"
 
 namespace cimdhcp {
 

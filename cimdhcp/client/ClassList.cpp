@@ -1,5 +1,8 @@
 #include "client/ClassList.h"
 
+#include "cimom/ClassDeclaration.h"
+#include "cimom/ClassRepository.h"
+
 namespace cimdhcp {
 
 std::vector<ClassEntry> servedClasses(const std::vector<cimom::Registration>& registrations,

@@ -3,8 +3,8 @@
 #include <string>
 #include <vector>
 
-#include "cimom/ClassRepository.h"
-#include "cimom/ObjectManager.h"
+#include "cimom/Forward.h"
+#include "cimom/Registrations.h"
 
 namespace cimdhcp {
 

@@ -1,5 +1,7 @@
 #include "client/Client.h"
 
+#include "client/Response.h"
+
 namespace cimdhcp {
 
 namespace {
@@ -18,6 +20,10 @@ std::vector<Object> present(std::vector<std::optional<Object>> objects) {
 }
 
 }  // namespace
+
+cimom::ObjectPath Client::classPath(const std::string& className) const {
+    return {"", nameSpace_, className, {}};
+}
 
 std::vector<cimom::ObjectPath> Client::pathsIn(const std::string& className) {
     const cimom::ObjectPath path = classPath(className);

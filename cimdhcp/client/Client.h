@@ -6,14 +6,16 @@
 #include <utility>
 #include <vector>
 
-#include "cimom/ObjectManager.h"
+#include "cimom/Forward.h"
 #include "client/ClassList.h"
 #include "client/ClassLookup.h"
-#include "client/MachineInterfaces.h"
-#include "client/Response.h"
 #include "text/Failure.h"
 
 namespace cimdhcp {
+
+struct MachineInterfaces;
+struct Response;
+struct ServedInstances;
 
 /// Sends the requests of the commands to the object manager of this process
 /// (EmbeddedClient) or to a WBEM server (RemoteClient). Every response has a CIM status;
@@ -27,9 +29,7 @@ class Client {
     /// The namespace of paths that name none.
     [[nodiscard]] const std::string& nameSpace() const noexcept { return nameSpace_; }
     /// The path of a class in that namespace.
-    [[nodiscard]] cimom::ObjectPath classPath(const std::string& className) const {
-        return {"", nameSpace_, className, {}};
-    }
+    [[nodiscard]] cimom::ObjectPath classPath(const std::string& className) const;
 
     /// Borrows the client.
     [[nodiscard]] virtual ClassLookup classes() = 0;

@@ -1,9 +1,11 @@
 #pragma once
 
+#include <chrono>
 #include <memory>
 #include <string>
 #include <vector>
 
+#include "cimom/ObjectManager.h"
 #include "client/Client.h"
 #include "client/Installation.h"
 
@@ -18,6 +20,12 @@ class EmbeddedClient : public Client {
     [[nodiscard]] const cimom::ClassRepository& repository() const noexcept;
     [[nodiscard]] const std::vector<cimom::Registration>& registrations() const noexcept;
     [[nodiscard]] cimom::ObjectManager& manager() noexcept { return *manager_; }
+
+    /// No request of the provider waits for the service processor, whose response comes later.
+    /// A program that ends after one request waits so long at most: a first request makes the
+    /// provider send its own to the service processor; a further one is sent after it, and its
+    /// response awaited, which comes after the response to the provider.
+    void awaitServiceProcessor(std::chrono::seconds patience);
 
     [[nodiscard]] ClassLookup classes() override { return repository(); }
     [[nodiscard]] std::vector<ClassEntry> servedClasses() override;

@@ -8,7 +8,6 @@
 #include <new>
 
 #include "cimom/Names.h"
-#include "cimom/Value.h"
 #include "text/DisplayText.h"
 
 namespace cimdhcp {

@@ -8,6 +8,7 @@
 #include <utility>
 #include <variant>
 
+#include "cimom/ClassDeclaration.h"
 #include "text/ValueMeaning.h"
 
 namespace cimdhcp {
@@ -36,6 +37,21 @@ const Kind* read(const ZR::Snapshot& snapshot, ZR::Snapshot::Index node, Propert
     return property == nullptr ? nullptr : std::get_if<Kind>(&property->value);
 }
 
+std::optional<std::uint64_t> numberOf(const ZR::Snapshot& snapshot, ZR::Snapshot::Index node,
+                                      Properties id) {
+    const auto* const number = read<std::uint64_t>(snapshot, node, id);
+    return number == nullptr ? std::nullopt : std::optional(*number);
+}
+
+/// A time that no clock reaches is one that never comes.
+std::optional<std::int64_t> momentOf(const ZR::Snapshot& snapshot, ZR::Snapshot::Index node,
+                                     Properties id) {
+    const auto number = numberOf(snapshot, node, id);
+    return number
+               ? std::optional(static_cast<std::int64_t>(std::min(*number, ZR::NodeLexicon::never)))
+               : std::nullopt;
+}
+
 std::string textOf(const ZR::Snapshot& snapshot, ZR::Snapshot::Index node, Properties id) {
     const auto* const text = read<std::string>(snapshot, node, id);
     return text == nullptr ? std::string() : *text;
@@ -56,33 +72,41 @@ std::string_view systemOf(const cimom::Instance& instance) {
                : hostSystem;
 }
 
-bool isZero(const cimom::Value& value) {
-    const cimom::Scalar* const scalar = value.scalar();
-    const auto* const number = scalar == nullptr ? nullptr : std::get_if<std::uint64_t>(scalar);
-    return number != nullptr && *number == 0;
-}
-
-/// The meaning of an enumerated property in small letters, its number when it has
-/// none; empty when it is not set.
-std::string words(const cimom::Instance& instance, const cimom::ClassDeclaration* declaration,
-                  const std::string& property) {
+std::optional<std::uint64_t> numberOf(const cimom::Instance& instance, std::string_view property) {
     const cimom::Value* const value = instance.property(property);
-    if (value == nullptr || value->isNull()) {
-        return {};
-    }
-    std::string result = meaningOf(declaration, {property, *value});
-    std::transform(result.begin(), result.end(), result.begin(), [](char letter) {
-        return letter >= 'A' && letter <= 'Z' ? static_cast<char>(letter - 'A' + 'a') : letter;
-    });
-    return result.empty() ? valueWithMeaning(nullptr, {property, *value}) : result;
+    const cimom::Scalar* const scalar = value == nullptr ? nullptr : value->scalar();
+    const auto* const number = scalar == nullptr ? nullptr : std::get_if<std::uint64_t>(scalar);
+    return number == nullptr ? std::nullopt : std::optional(*number);
 }
 
-/// The state of the client; while it has none, whether it is enabled.
-std::string stateOf(const cimom::Instance& endpoint, const ClassLookup& classes) {
-    const cimom::ClassDeclaration* const declaration = classes.find(endpoint.path.className);
-    const cimom::Value* const client = endpoint.property("ClientState");
-    const bool told = client != nullptr && !client->isNull() && !isZero(*client);
-    return words(endpoint, declaration, told ? "ClientState" : "EnabledState");
+LeaseOverview leaseOf(const ZR::Snapshot& snapshot, ZR::Snapshot::Index node) {
+    LeaseOverview lease;
+    lease.family = textOf(snapshot, node, Properties::Family);
+    lease.clientState = numberOf(snapshot, node, Properties::ClientState);
+    lease.address = textOf(snapshot, node, Properties::Address);
+    lease.server = textOf(snapshot, node, Properties::ServerAddress);
+    lease.obtained = momentOf(snapshot, node, Properties::LeaseObtained);
+    lease.renews = momentOf(snapshot, node, Properties::RenewalTime);
+    lease.rebinds = momentOf(snapshot, node, Properties::RebindingTime);
+    lease.expires = momentOf(snapshot, node, Properties::LeaseExpires);
+    if (const auto* options =
+            read<std::vector<std::uint64_t>>(snapshot, node, Properties::OptionsReceived)) {
+        lease.options = *options;
+    }
+    lease.clientIdentifier = textOf(snapshot, node, Properties::ClientIdentifier);
+    lease.client = textOf(snapshot, node, Properties::Client);
+    lease.process = numberOf(snapshot, node, Properties::Process);
+    lease.source = textOf(snapshot, node, Properties::Source);
+    return lease;
+}
+
+/// Whether a diagnostic says of the interface that the client of its lease does not run.
+bool isClientGone(const ZR::Snapshot& snapshot, const std::string& interface) {
+    const auto diagnostics = snapshot.diagnostics();
+    return std::any_of(diagnostics.begin(), diagnostics.end(), [&](const ZR::Diagnostic& each) {
+        return each.kind == ZR::Diagnostic::Kind::ClientGone &&
+               each.text.starts_with(interface + ": ");
+    });
 }
 
 }  // namespace
@@ -98,27 +122,45 @@ std::optional<InterfaceId> readInterfaceId(const std::string& text) {
 
 std::vector<InterfaceOverview> interfacesOf(const ZR::Snapshot& snapshot) {
     std::vector<InterfaceOverview> interfaces;
+    std::unordered_map<ZR::Snapshot::Index, std::size_t> places;
     for (ZR::Snapshot::Index node = snapshot.first(NodeType::NetworkInterface);
          node != ZR::Snapshot::none; node = snapshot.node(node).nextOfType) {
         InterfaceOverview overview;
         overview.system = systemOf(snapshot, node);
         overview.name = textOf(snapshot, node, Properties::Name);
-        overview.address = textOf(snapshot, node, Properties::IPv4Address);
-        const auto* const state = read<std::uint64_t>(snapshot, node, Properties::InterfaceState);
-        if (state != nullptr) {
-            overview.state = *state == activeInterface ? "active" : "inactive";
+        if (const auto* const enabled = read<bool>(snapshot, node, Properties::DHCPEnabled)) {
+            overview.dhcp = *enabled;
         }
+        if (const auto state = numberOf(snapshot, node, Properties::InterfaceState)) {
+            overview.active = *state == activeInterface;
+        }
+        overview.address = textOf(snapshot, node, Properties::IPv4Address);
+        overview.addressSource = numberOf(snapshot, node, Properties::AddressSource);
+        overview.leases.emplace();
+        places[node] = interfaces.size();
         interfaces.push_back(std::move(overview));
+    }
+    for (ZR::Snapshot::Index node = snapshot.first(NodeType::DHCPLease); node != ZR::Snapshot::none;
+         node = snapshot.node(node).nextOfType) {
+        const auto place = places.find(snapshot.node(node).parent);
+        if (place != places.end()) {
+            InterfaceOverview& interface = interfaces[place->second];
+            LeaseOverview lease = leaseOf(snapshot, node);
+            lease.clientGone = !lease.process && isClientGone(snapshot, interface.name);
+            interface.leases->push_back(std::move(lease));
+        }
     }
     return interfaces;
 }
 
-std::vector<InterfaceOverview> interfacesOf(const std::vector<cimom::Instance>& settings,
-                                            const std::vector<cimom::Instance>& ipEndpoints,
-                                            const std::vector<std::string>& processors) {
+std::vector<InterfaceOverview> interfacesOf(
+    const std::vector<cimom::Instance>& settings,
+    const std::optional<std::vector<cimom::Instance>>& ipEndpoints,
+    const std::vector<std::string>& processors) {
     const std::unordered_set<std::string> processorNames(processors.begin(), processors.end());
+    const std::vector<cimom::Instance> nothing;
     std::unordered_map<std::string, std::string> addresses;  // by idOf()
-    for (const cimom::Instance& endpoint : ipEndpoints) {
+    for (const cimom::Instance& endpoint : ipEndpoints ? *ipEndpoints : nothing) {
         const bool processor = processorNames.contains(text(endpoint, "SystemName"));
         addresses[idOf(processor ? serviceProcessorSystem : hostSystem, text(endpoint, "Name"))] =
             text(endpoint, "IPv4Address");
@@ -133,16 +175,16 @@ std::vector<InterfaceOverview> interfacesOf(const std::vector<cimom::Instance>& 
         InterfaceOverview overview;
         overview.system = std::move(id->system);
         overview.name = std::move(id->name);
-        if (const auto found = addresses.find(whole); found != addresses.end()) {
-            overview.address = found->second;
+        if (ipEndpoints) {
+            const auto found = addresses.find(whole);
+            overview.address = found == addresses.end() ? std::string() : found->second;
         }
         interfaces.push_back(std::move(overview));
     }
     return interfaces;
 }
 
-void addServed(const ServedInstances& served, const ClassLookup& classes,
-               std::vector<InterfaceOverview>& interfaces) {
+void addServed(const ServedInstances& served, std::vector<InterfaceOverview>& interfaces) {
     // By idOf().
     std::unordered_map<std::string, const cimom::Instance*> endpoints;
     std::unordered_map<std::string, std::vector<std::string>> servers;
@@ -164,16 +206,21 @@ void addServed(const ServedInstances& served, const ClassLookup& classes,
         const std::string id = idOf(interface.system, interface.name);
         if (served.endpoints) {
             const auto endpoint = endpoints.find(id);
-            interface.dhcp = endpoint != endpoints.end();
-            if (*interface.dhcp) {
-                interface.state = stateOf(*endpoint->second, classes);
+            const bool there = endpoint != endpoints.end();
+            if (there) {
+                interface.clientState = numberOf(*endpoint->second, "ClientState");
+            }
+            if (!interface.leases) {
+                interface.dhcp = there;
             }
         }
-        if (const auto found = servers.find(id); found != servers.end()) {
-            interface.servers = found->second;
+        if (served.accessPoints) {
+            interface.servers = servers[id];
         }
         if (const auto found = settings.find(id); found != settings.end()) {
             interface.configurationName = text(*found->second, "ConfigurationName");
+        } else if (served.settings) {
+            interface.configurationName.emplace();
         }
     }
 }

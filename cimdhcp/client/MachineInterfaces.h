@@ -1,12 +1,12 @@
 #pragma once
 
+#include <cstdint>
 #include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
 
 #include "cimom/Instance.h"
-#include "client/ClassLookup.h"
 #include "zrclient/Snapshot.h"
 
 namespace cimdhcp {
@@ -26,22 +26,48 @@ struct InterfaceId {
 /// Reads "Computer%eth0". None when the text is not of that form.
 [[nodiscard]] std::optional<InterfaceId> readInterfaceId(const std::string& text);
 
-/// One network interface at a glance. Empty texts: not known, or there is none.
+/// A lease of an interface, or a client that asks for one: a DHCPLease node of the tree.
+/// Empty texts and lists: not told. Times in seconds since the epoch.
+struct LeaseOverview {
+    std::string family;                        ///< NodeLexicon::familyIPv4 or familyIPv6
+    std::optional<std::uint64_t> clientState;  ///< a NodeLexicon::ClientState
+    std::string address;                       ///< empty: the client asks for one
+    std::string server;
+    std::optional<std::int64_t> obtained;
+    std::optional<std::int64_t> renews;
+    std::optional<std::int64_t> rebinds;
+    std::optional<std::int64_t> expires;  ///< NodeLexicon::never: it has no end
+    std::vector<std::uint64_t> options;
+    std::string clientIdentifier;
+    std::string client;
+    std::optional<std::uint64_t> process;
+    std::string source;
+    bool clientGone = false;  ///< a diagnostic says that its client does not run
+
+    bool operator==(const LeaseOverview&) const = default;
+};
+
+/// One network interface at a glance. Of optional parts, none means that it is not known,
+/// and an empty one that there is none.
 struct InterfaceOverview {
     std::string system;  ///< hostSystem or serviceProcessorSystem
     std::string name;
-    std::optional<bool> dhcp;  ///< none: the provider does not tell
-    std::string state;         ///< in words
-    std::string address;
-    std::vector<std::string> servers;  ///< addresses
-    std::string configurationName;
+    std::optional<bool> dhcp;
+    std::optional<bool> active;  ///< its link is up, and has a cable
+    std::optional<std::string> address;
+    std::optional<std::uint64_t> addressSource;        ///< a NodeLexicon::AddressSource
+    std::optional<std::uint64_t> clientState;          ///< of the DHCP endpoint
+    std::optional<std::vector<LeaseOverview>> leases;  ///< in the tree's order
+    std::optional<std::vector<std::string>> servers;   ///< addresses
+    std::optional<std::string> configurationName;
 
     bool operator==(const InterfaceOverview&) const = default;
 };
 
 struct MachineInterfaces {
     std::vector<InterfaceOverview> interfaces;
-    std::vector<std::string> remarks;  ///< on what could not be read of the machine
+    /// On what could not be read of the machine, or is not as it looks.
+    std::vector<ZR::Diagnostic> diagnostics;
 
     bool operator==(const MachineInterfaces&) const = default;
 };
@@ -53,20 +79,21 @@ struct ServedInstances {
     std::optional<std::vector<cimom::Instance>> settings;
 };
 
-/// The interfaces of a tree in its order, with the state of the interface itself
-/// and nothing about DHCP.
+/// The interfaces of a tree in its order, with all but what the provider alone tells:
+/// servers and configuration names.
 [[nodiscard]] std::vector<InterfaceOverview> interfacesOf(const ZR::Snapshot& snapshot);
 
 /// The interfaces of another machine, as far as its provider tells: those that have a
-/// setting, in their order, with the addresses of their IP endpoints. `processors` are
-/// the names of its service processors. The state of an interface that does not use
-/// DHCP is not known.
+/// setting, in their order, with the addresses of their IP endpoints (none: these are not
+/// served). `processors` are the names of its service processors. What a tree alone tells
+/// is not known: links, and leases.
 [[nodiscard]] std::vector<InterfaceOverview> interfacesOf(
-    const std::vector<cimom::Instance>& settings, const std::vector<cimom::Instance>& ipEndpoints,
+    const std::vector<cimom::Instance>& settings,
+    const std::optional<std::vector<cimom::Instance>>& ipEndpoints,
     const std::vector<std::string>& processors);
 
-/// Puts what the provider tells beside the interfaces.
-void addServed(const ServedInstances& served, const ClassLookup& classes,
-               std::vector<InterfaceOverview>& interfaces);
+/// Puts what the provider tells beside the interfaces. Whether DHCP is on is taken from it
+/// where there is no tree to tell.
+void addServed(const ServedInstances& served, std::vector<InterfaceOverview>& interfaces);
 
 }  // namespace cimdhcp

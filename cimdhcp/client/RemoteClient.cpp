@@ -4,10 +4,16 @@
 #include <unordered_set>
 #include <utility>
 
+#include "cimom/ClassDeclaration.h"
 #include "cimom/Names.h"
+#include "cimom/Requests.h"
 #include "cimxml/ClassReader.h"
 #include "cimxml/Errors.h"
 #include "cimxml/HttpStatus.h"
+#include "cimxml/OperationRequest.h"
+#include "cimxml/OperationResponse.h"
+#include "client/MachineInterfaces.h"
+#include "client/Response.h"
 #include "client/StatusMessage.h"
 #include "text/DisplayText.h"
 #include "text/ValueMeaning.h"
@@ -141,6 +147,8 @@ std::vector<ClassEntry> leavesOf(const std::vector<ClassEntry>& classes) {
 RemoteClient::RemoteClient(const ServerUrl& url, HttpSettings settings, const Deadline& deadline,
                            std::string nameSpace)
     : Client(std::move(nameSpace)), connection_(url, std::move(settings), deadline) {}
+
+RemoteClient::~RemoteClient() = default;
 
 OperationResponse RemoteClient::ask(const OperationRequest& request) {
     try {
@@ -319,9 +327,7 @@ MachineInterfaces RemoteClient::interfaces(const ServedInstances& served) {
     for (const auto& path : systems.paths) {
         processors.push_back(heldText(path->key("Name")));
     }
-    return {interfacesOf(served.settings ? *served.settings : nothing,
-                         endpoints ? *endpoints : nothing, processors),
-            {}};
+    return {interfacesOf(served.settings ? *served.settings : nothing, endpoints, processors), {}};
 }
 
 std::optional<std::string> RemoteClient::dataDir() const {

@@ -5,10 +5,13 @@
 #include <unordered_map>
 #include <vector>
 
-#include "cimxml/OperationRequest.h"
-#include "cimxml/OperationResponse.h"
 #include "client/Client.h"
 #include "client/HttpConnection.h"
+
+namespace cimom::wbem {
+class OperationRequest;
+struct OperationResponse;
+}  // namespace cimom::wbem
 
 namespace cimdhcp {
 
@@ -19,6 +22,9 @@ class RemoteClient : public Client {
   public:
     RemoteClient(const ServerUrl& url, HttpSettings settings, const Deadline& deadline,
                  std::string nameSpace);
+    ~RemoteClient() override;
+    RemoteClient(const RemoteClient&) = delete;
+    RemoteClient& operator=(const RemoteClient&) = delete;
 
     /// Each class is asked for once, when it is first needed.
     [[nodiscard]] ClassLookup classes() override;

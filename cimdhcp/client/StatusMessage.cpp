@@ -2,6 +2,7 @@
 
 #include "cimom/ObjectPathText.h"
 #include "cimxml/Errors.h"
+#include "client/Response.h"
 #include "text/DisplayText.h"
 
 namespace cimdhcp {

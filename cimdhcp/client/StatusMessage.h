@@ -3,11 +3,11 @@
 #include <string>
 #include <string_view>
 
-#include "cimom/ObjectPath.h"
-#include "cimom/Status.h"
-#include "client/Response.h"
+#include "cimom/Forward.h"
 
 namespace cimdhcp {
+
+struct Response;
 
 /// The name of a status, also of those that only servers give (DSP0200, 5.2.7).
 [[nodiscard]] std::string_view statusNameOf(const cimom::Status& status) noexcept;

@@ -3,18 +3,19 @@
 #include <unistd.h>
 
 #include <algorithm>
-#include <cerrno>
+#include <cstdint>
 #include <cstdlib>
-#include <cstring>
 #include <optional>
 #include <sstream>
 #include <utility>
-#include <variant>
 
 #include "arguments/Directories.h"
+#include "cimom/Instance.h"
 #include "client/EmbeddedClient.h"
+#include "client/Response.h"
 #include "commands/DataDirectory.h"
 #include "commands/HiddenClients.h"
+#include "commands/MachineFindings.h"
 #include "commands/PlatformSetup.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
@@ -27,14 +28,13 @@ namespace {
 
 namespace fs = std::filesystem;
 using Verdict = Finding::Verdict;
-using ZR::NodeLexicon::NodeType;
-using ZR::NodeLexicon::Properties;
 
 /// What was found, part after part.
 class Examination {
   public:
-    Examination(const Options& options, const std::vector<Directories>& installations)
-        : options_(options), installations_(installations) {}
+    Examination(const Options& options, const std::vector<Directories>& installations,
+                std::int64_t now)
+        : options_(options), installations_(installations), now_(now) {}
 
     std::vector<Finding> examine() {
         const bool machine = lookAtSettings();
@@ -88,21 +88,14 @@ class Examination {
 
     void lookAtMachine() {
         const std::string& tree = treeName();
-        if (tree.empty()) {
-            lookAtLiveSources();
-        }
         const auto snapshot = ZR::InstrumentationService::process().current();
-        std::size_t interfaces = 0;
-        for (auto node = snapshot->first(NodeType::NetworkInterface); node != ZR::Snapshot::none;
-             node = snapshot->node(node).nextOfType) {
-            ++interfaces;
-            const auto* const property = snapshot->find(node, Properties::DHCPEnabled);
-            const bool* const enabled =
-                property == nullptr ? nullptr : std::get_if<bool>(&property->value);
-            if (enabled != nullptr && *enabled) {
-                ++dhcpInterfaces_;
-            }
-        }
+        const auto diagnostics = snapshot->diagnostics();
+        const MachineInterfaces machine{interfacesOf(*snapshot),
+                                        {diagnostics.begin(), diagnostics.end()}};
+        const std::size_t interfaces = machine.interfaces.size();
+        dhcpInterfaces_ = static_cast<std::size_t>(
+            std::count_if(machine.interfaces.begin(), machine.interfaces.end(),
+                          [](const InterfaceOverview& each) { return each.dhcp.value_or(false); }));
         const std::string where = tree.empty() ? "the live machine" : "tree " + tree;
         const std::string detail = where + " has " +
                                    counted(interfaces, "interface", "interfaces") + ", " +
@@ -111,48 +104,23 @@ class Examination {
             add(Verdict::good, "machine", detail);
         } else {
             add(Verdict::notable, "machine", detail + ": the DHCP classes are empty",
-                "\"cimdhcp tree\" shows what is seen; a DHCP client has to run and to have a live "
-                "lease");
+                "\"cimdhcp tree --explain\" shows what is seen, and from where; DHCP is on where a "
+                "client runs or the address came from one");
+        }
+        if (tree.empty()) {
+            lookAtProcesses();
+        }
+        for (Finding& finding : machineFindings(machine, now_)) {
+            findings_.push_back(std::move(finding));
         }
     }
 
-    /// State files of DHCP clients that are there and that this user may not read.
-    void lookAtLiveSources() {
-        for (const char* directory : {"/run/systemd/netif/links", "/run/systemd/netif/leases",
-                                      "/var/lib/dhcp", "/var/lib/dhclient"}) {
-            std::error_code error;
-            if (!fs::is_directory(directory, error)) {
-                continue;
-            }
-            bool readable = ::access(directory, R_OK | X_OK) == 0;
-            for (fs::directory_iterator entry(directory, error); !error && entry != end(entry);
-                 entry.increment(error)) {
-                readable = readable && ::access(entry->path().c_str(), R_OK) == 0;
-            }
-            if (readable && !error) {
-                add(Verdict::good, "live source", std::string(directory) + " can be read");
-            } else {
-                add(Verdict::notable, "live source",
-                    std::string(directory) + " cannot be read whole by this user",
-                    "run as root, or add the user to the group that may read it");
-            }
-        }
-        lookAtClients();
-    }
-
-    /// Processes of DHCP clients that this user may not look into.
-    void lookAtClients() {
-        const HiddenClients hidden = findHiddenClients();
-        if (hidden.otherUsersHidden) {
-            add(Verdict::notable, "live source",
+    /// Clients may be among processes that this user cannot see.
+    void lookAtProcesses() {
+        if (areProcessesHidden()) {
+            add(Verdict::notable, "rights",
                 "/proc hides the processes of other users: DHCP clients among them are not seen",
                 "run as root, or add the user to the group that /proc is mounted for (gid=)");
-        }
-        for (const std::string& process : hidden.processes) {
-            add(Verdict::notable, "live source",
-                "the network of " + printable(process) +
-                    " is hidden from this user: what it does is not seen",
-                "run as root, or with CAP_SYS_PTRACE; for the service see docs/server.md");
         }
     }
 
@@ -294,6 +262,7 @@ class Examination {
 
     const Options& options_;
     const std::vector<Directories>& installations_;
+    std::int64_t now_;
     std::vector<Finding> findings_;
     std::optional<EmbeddedClient> client_;
     std::size_t dhcpInterfaces_ = 0;
@@ -301,8 +270,9 @@ class Examination {
 
 }  // namespace
 
-std::vector<Finding> check(const Options& options, const std::vector<Directories>& installations) {
-    return Examination(options, installations).examine();
+std::vector<Finding> check(const Options& options, const std::vector<Directories>& installations,
+                           std::int64_t now) {
+    return Examination(options, installations, now).examine();
 }
 
 }  // namespace cimdhcp

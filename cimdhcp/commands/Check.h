@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstdint>
 #include <vector>
 
 #include "arguments/Commands.h"
@@ -11,8 +12,9 @@ namespace cimdhcp {
 /// Examines everything that a response depends on, from the settings file to one
 /// enumeration of each served class, and explains why something is empty. Later
 /// parts are examined as far as the failure of earlier ones allows. Hands the
-/// options to the platform (see setUpPlatform).
+/// options to the platform (see setUpPlatform). `now` in seconds since the epoch.
 [[nodiscard]] std::vector<Finding> check(const Options& options,
-                                         const std::vector<Directories>& installations);
+                                         const std::vector<Directories>& installations,
+                                         std::int64_t now);
 
 }  // namespace cimdhcp

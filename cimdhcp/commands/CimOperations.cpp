@@ -1,6 +1,13 @@
 #include "commands/CimOperations.h"
 
 #include "arguments/PathArgument.h"
+#include "arguments/ValueReading.h"
+#include "cimom/ClassDeclaration.h"
+#include "cimom/Instance.h"
+#include "cimom/Requests.h"
+#include "client/Client.h"
+#include "text/DisplayText.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 

@@ -2,10 +2,11 @@
 
 #include "arguments/Commands.h"
 #include "cimom/ObjectPath.h"
-#include "client/Client.h"
 #include "client/Response.h"
 
 namespace cimdhcp {
+
+class Client;
 
 /// One CIM operation that was carried out, whatever the status of its response.
 struct CimOperation {

@@ -4,8 +4,11 @@
 #include <type_traits>
 #include <utility>
 
+#include "client/Client.h"
+#include "client/Response.h"
 #include "commands/CimOperations.h"
 #include "commands/ClassTable.h"
+#include "commands/DiagnosticText.h"
 #include "commands/Graph.h"
 #include "commands/GraphDrawing.h"
 #include "commands/Overview.h"
@@ -29,9 +32,20 @@ class Execution {
     Outcome operator()(const ShowCommand& /*command*/) const {
         const ServedInstances served = askProvider(client_);
         MachineInterfaces machine = client_.interfaces(served);
-        addServed(served, client_.classes(), machine.interfaces);
-        return {list(overviewColumns(), std::move(machine.interfaces), overviewTable, overviewJson),
-                remarkLine(machine.remarks), std::nullopt};
+        addServed(served, machine.interfaces);
+        const std::int64_t now = presentation_.now;
+        std::string diagnostics = diagnosticText(machine.diagnostics, machine.interfaces);
+        if (!presentation_.count) {
+            diagnostics += unknownText(machine.interfaces, now);
+        }
+        using Rows = std::vector<InterfaceOverview>;
+        return {list(
+                    overviewColumns(now), std::move(machine.interfaces),
+                    [now](const Rows& rows, std::optional<std::size_t> width, const Style& style) {
+                        return overviewTable(rows, now, width, style);
+                    },
+                    [now](const Rows& rows) { return overviewJson(rows, now); }),
+                std::move(diagnostics), std::nullopt};
     }
 
     Outcome operator()(const ClassesCommand& /*command*/) const {
@@ -71,11 +85,10 @@ class Execution {
     }
 
   private:
-    template <typename Row>
+    /// `table` and `json` make the text of rows; a table has a width and a style, too.
+    template <typename Row, typename TableText, typename JsonText>
     std::string list(const std::vector<Column<Row>>& columns, std::vector<Row> rows,
-                     std::string (*table)(const std::vector<Row>&, std::optional<std::size_t>,
-                                          const Style&),
-                     std::string (*json)(const std::vector<Row>&)) const {
+                     const TableText& table, const JsonText& json) const {
         if (presentation_.sort) {
             sortBy(*presentation_.sort, columns, rows);
         }

@@ -4,16 +4,17 @@
 #include <string>
 
 #include "arguments/Commands.h"
-#include "client/Client.h"
 #include "text/Failure.h"
 #include "text/Presentation.h"
 
 namespace cimdhcp {
 
+class Client;
+
 /// The outcome of a command.
 struct Outcome {
     std::string text;                ///< for standard output
-    std::string remarks;             ///< for standard error
+    std::string diagnostics;         ///< for standard error
     std::optional<Failure> failure;  ///< what ends the program when both are written
 };
 

@@ -75,8 +75,9 @@ void FleetOutput::show(ServerReport&& report) {
     progress_.hide();
     ++arrived_;
     outputs_.out << (presentation_.json() ? jsonOf(report) : textOf(report)) << std::flush;
-    if (!report.outcome.remarks.empty()) {
-        outputs_.err << nameOf(report) << ": " << report.outcome.remarks;
+    std::istringstream lines(report.outcome.diagnostics);
+    for (std::string line; std::getline(lines, line);) {
+        say(line, nameOf(report), diagnostics_);
     }
     if (report.outcome.failure) {
         failures_.emplace_back(report.server, report.outcome.failure->what());
@@ -88,6 +89,13 @@ ExitStatus FleetOutput::finish(bool interrupted) {
     progress_.hide();
     std::sort(failures_.begin(), failures_.end());
     const std::string total = std::to_string(servers_.size());
+    for (Said& each : diagnostics_) {
+        std::sort(each.subjects.begin(), each.subjects.end());
+        const std::size_t count = each.subjects.size();
+        outputs_.err << (count > mostTold ? std::to_string(count) + " servers"
+                                          : shortList(each.subjects))
+                     << ": " << each.what << '\n';
+    }
     if (!failures_.empty()) {
         outputs_.err << errorStyle_.alarming("cimdhcp:") << ' ' << failures_.size() << " of "
                      << total << " servers failed:\n";

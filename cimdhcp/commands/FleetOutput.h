@@ -6,6 +6,7 @@
 #include <vector>
 
 #include "arguments/Commands.h"
+#include "commands/DiagnosticText.h"
 #include "commands/Fleet.h"
 #include "commands/Outputs.h"
 #include "text/Presentation.h"
@@ -28,8 +29,8 @@ class FleetOutput {
 
     void show(ServerReport&& report);
 
-    /// Lists the failures, and returns how the program ends. Servers that have not
-    /// reported count as not asked.
+    /// Lists the diagnostics, like ones of several servers once, and the failures; returns
+    /// how the program ends. Servers that have not reported count as not asked.
     ExitStatus finish(bool interrupted);
 
   private:
@@ -45,6 +46,7 @@ class FleetOutput {
     ProgressBar progress_;
     std::size_t arrived_ = 0;
     std::vector<std::pair<std::size_t, std::string>> failures_;  ///< server and message
+    std::vector<Said> diagnostics_;                              ///< of servers
 };
 
 }  // namespace cimdhcp

@@ -7,7 +7,10 @@
 #include <string_view>
 #include <utility>
 
+#include "cimom/Instance.h"
 #include "cimom/Names.h"
+#include "client/Client.h"
+#include "client/Response.h"
 #include "text/DisplayText.h"
 #include "text/ValueMeaning.h"
 

@@ -4,9 +4,11 @@
 #include <string>
 #include <vector>
 
-#include "client/Client.h"
+#include "cimom/ObjectPath.h"
 
 namespace cimdhcp {
+
+class Client;
 
 /// An instance in a picture of the machine.
 struct GraphNode {

@@ -5,9 +5,12 @@
 #include <utility>
 #include <vector>
 
+#include "arguments/Commands.h"
 #include "arguments/PathArgument.h"
 #include "arguments/ValueReading.h"
+#include "cimom/ClassDeclaration.h"
 #include "cimom/Names.h"
+#include "client/Client.h"
 #include "commands/CimOperations.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"

@@ -1,28 +1,170 @@
 #include "commands/Overview.h"
 
 #include <algorithm>
+#include <array>
+#include <string_view>
 #include <utility>
 
+#include "client/Client.h"
+#include "client/InterfaceState.h"
+#include "commands/DiagnosticText.h"
 #include "text/DisplayText.h"
 #include "text/JsonText.h"
+#include "text/Moment.h"
+#include "zrclient/NodeLexicon.h"
 
 namespace cimdhcp {
 
 namespace {
 
-std::string cell(std::optional<bool> on) {
-    if (!on) {
-        return "-";
-    }
-    return *on ? "on" : "off";
+using Row = InterfaceOverview;
+
+constexpr const char* none = "-";
+constexpr const char* unknown = "?";
+
+/// The columns of what may be unknown, and their names in JSON.
+struct Field {
+    std::string_view heading;
+    std::string_view key;
+};
+constexpr std::array<Field, 7> fields{{{"DHCP", "dhcp"},
+                                       {"STATE", "state"},
+                                       {"CLIENT", "client"},
+                                       {"ADDRESS", "address"},
+                                       {"EXPIRES", "expires"},
+                                       {"SERVERS", "servers"},
+                                       {"CONFIGURATION NAME", "configurationName"}}};
+
+std::string cell(const std::optional<std::string>& text) {
+    return text ? cellOf(*text) : unknown;
 }
 
-std::string cell(const std::vector<std::string>& texts) {
+std::string cell(const std::optional<std::vector<std::string>>& texts) {
+    if (!texts) {
+        return unknown;
+    }
     std::string joined;
-    for (const std::string& text : texts) {
+    for (const std::string& text : *texts) {
         joined += (joined.empty() ? "" : ", ") + cellOf(text);
     }
     return cellOf(joined);
+}
+
+std::string dhcpCell(const Row& row) {
+    return !row.dhcp ? unknown : *row.dhcp ? "on" : "off";
+}
+
+/// The program that has the leading lease, or asks for one. Empty: there is none; none: it
+/// is not known.
+std::optional<std::string> clientOf(const Row& row) {
+    if (const LeaseOverview* const lease = leadingLease(row)) {
+        return lease->client.empty() ? std::nullopt : std::optional(lease->client);
+    }
+    return row.dhcp == false ? std::optional<std::string>("") : std::nullopt;
+}
+
+/// The interface's own address; without one, that of a DHCPv6 lease that has not ended.
+std::optional<std::string> addressOf(const Row& row, std::int64_t now) {
+    if (!row.address || !row.address->empty() || !row.leases) {
+        return row.address;
+    }
+    for (const LeaseOverview& lease : *row.leases) {
+        if (lease.family == ZR::NodeLexicon::familyIPv6 && !lease.address.empty() &&
+            stateOf(lease, row, now) != InterfaceState::expired) {
+            return lease.address;
+        }
+    }
+    return row.address;
+}
+
+/// Whether the interface has a lease, or may have one, whose end could be told.
+bool mayExpire(const Row& row, std::int64_t now) {
+    const LeaseOverview* const lease = leadingLease(row);
+    if (lease == nullptr) {
+        return row.dhcp != false;
+    }
+    return !lease->address.empty() || stateOf(*lease, row, now) != InterfaceState::asking;
+}
+
+std::optional<std::int64_t> endOf(const Row& row) {
+    const LeaseOverview* const lease = leadingLease(row);
+    return lease == nullptr ? std::nullopt : lease->expires;
+}
+
+std::string expiresCell(const Row& row, std::int64_t now) {
+    if (const auto end = endOf(row)) {
+        return *end >= static_cast<std::int64_t>(ZR::NodeLexicon::never) ? "never"
+                                                                         : relativeText(*end, now);
+    }
+    return mayExpire(row, now) ? unknown : none;
+}
+
+std::string expiresOrder(const Row& row, std::int64_t now) {
+    const auto end = endOf(row);
+    return end ? std::to_string(*end) : expiresCell(row, now);
+}
+
+/// The fields of a row that are not known.
+std::vector<Field> unknownFields(const Row& row, std::int64_t now) {
+    std::vector<Field> found;
+    for (const Column<Row>& column : overviewColumns(now)) {
+        const auto* const field =
+            std::find_if(fields.begin(), fields.end(),
+                         [&column](const Field& each) { return each.heading == column.heading; });
+        if (field != fields.end() && column.cell(row) == unknown) {
+            found.push_back(*field);
+        }
+    }
+    return found;
+}
+
+Json momentJson(std::optional<std::int64_t> moment) {
+    return moment ? Json(JsonMembers{{"seconds", *moment}, {"time", isoText(*moment)}})
+                  : Json(nullptr);
+}
+
+Json stateJson(InterfaceState state) {
+    return state == InterfaceState::unknown ? Json(nullptr) : Json(std::string(wordOf(state)));
+}
+
+Json numberJson(std::optional<std::uint64_t> number) {
+    return number ? Json(*number) : Json(nullptr);
+}
+
+Json leaseJson(const LeaseOverview& lease, const Row& row, std::int64_t now) {
+    return JsonMembers{{"state", stateJson(stateOf(lease, row, now))},
+                       {"family", textOrNull(lease.family)},
+                       {"clientState", numberJson(lease.clientState)},
+                       {"address", textOrNull(lease.address)},
+                       {"serverAddress", textOrNull(lease.server)},
+                       {"leaseObtained", momentJson(lease.obtained)},
+                       {"renewalTime", momentJson(lease.renews)},
+                       {"rebindingTime", momentJson(lease.rebinds)},
+                       {"leaseExpires", momentJson(lease.expires)},
+                       {"optionsReceived", JsonList(lease.options.begin(), lease.options.end())},
+                       {"clientIdentifier", textOrNull(lease.clientIdentifier)},
+                       {"client", textOrNull(lease.client)},
+                       {"process", numberJson(lease.process)},
+                       {"source", textOrNull(lease.source)}};
+}
+
+Json leasesJson(const Row& row, std::int64_t now) {
+    if (!row.leases) {
+        return nullptr;
+    }
+    JsonList list;
+    for (const LeaseOverview& lease : *row.leases) {
+        list.push_back(leaseJson(lease, row, now));
+    }
+    return list;
+}
+
+Json textJson(const std::optional<std::string>& text) {
+    return text ? textOrNull(*text) : Json(nullptr);
+}
+
+Json boolJson(std::optional<bool> value) {
+    return value ? Json(*value) : Json(nullptr);
 }
 
 }  // namespace
@@ -33,20 +175,20 @@ ServedInstances askProvider(Client& client) {
             client.instancesIn("QVXZR_DHCPSettingData")};
 }
 
-const std::vector<Column<InterfaceOverview>>& overviewColumns() {
-    using Row = InterfaceOverview;
-    static const std::vector<Column<Row>> columns{
-        {"SYSTEM", [](const Row& row) { return row.system; }},
-        {"INTERFACE", [](const Row& row) { return cellOf(row.name); }},
-        {"DHCP", [](const Row& row) { return cell(row.dhcp); }},
-        {"STATE", [](const Row& row) { return cellOf(row.state); }},
-        {"ADDRESS", [](const Row& row) { return cellOf(row.address); }},
-        {"SERVERS", [](const Row& row) { return cell(row.servers); }},
-        {"CONFIGURATION NAME", [](const Row& row) { return cellOf(row.configurationName); }}};
-    return columns;
+std::vector<Column<InterfaceOverview>> overviewColumns(std::int64_t now) {
+    return {{"SYSTEM", [](const Row& row) { return row.system; }},
+            {"INTERFACE", [](const Row& row) { return cellOf(row.name); }},
+            {"DHCP", dhcpCell},
+            {"STATE", [now](const Row& row) { return std::string(wordOf(stateOf(row, now))); }},
+            {"CLIENT", [](const Row& row) { return cell(clientOf(row)); }},
+            {"ADDRESS", [now](const Row& row) { return cell(addressOf(row, now)); }},
+            {"EXPIRES", [now](const Row& row) { return expiresCell(row, now); },
+             [now](const Row& row) { return expiresOrder(row, now); }},
+            {"SERVERS", [](const Row& row) { return cell(row.servers); }},
+            {"CONFIGURATION NAME", [](const Row& row) { return cell(row.configurationName); }}};
 }
 
-std::string overviewTable(const std::vector<InterfaceOverview>& interfaces,
+std::string overviewTable(const std::vector<InterfaceOverview>& interfaces, std::int64_t now,
                           std::optional<std::size_t> width, const Style& style) {
     if (interfaces.empty()) {
         return style.header ? "This machine has no network interfaces.\n" : "";
@@ -54,7 +196,7 @@ std::string overviewTable(const std::vector<InterfaceOverview>& interfaces,
     const bool oneSystem =
         std::all_of(interfaces.begin(), interfaces.end(),
                     [](const InterfaceOverview& each) { return each.system == hostSystem; });
-    auto columns = overviewColumns();
+    auto columns = overviewColumns(now);
     if (oneSystem) {
         columns.erase(columns.begin());
     }
@@ -65,34 +207,72 @@ std::string overviewTable(const std::vector<InterfaceOverview>& interfaces,
            (noneUsesDhcp && style.header ? "No interface of this machine uses DHCP.\n" : "");
 }
 
-std::string remarkLine(std::span<const std::string> remarks) {
-    if (remarks.empty()) {
-        return {};
-    }
-    constexpr std::size_t mostTold = 4;
-    std::string line = "cimdhcp: not everything could be read: ";
-    for (const std::string& remark : remarks.first(std::min(remarks.size(), mostTold))) {
-        line += (&remark == &remarks.front() ? "" : "; ") + printable(remark);
-    }
-    if (remarks.size() > mostTold) {
-        line +=
-            "; and " + std::to_string(remarks.size() - mostTold) + " more, which are in the log";
-    }
-    return line + '\n';
-}
-
-std::string overviewJson(const std::vector<InterfaceOverview>& interfaces) {
+std::string overviewJson(const std::vector<InterfaceOverview>& interfaces, std::int64_t now) {
     JsonList list;
     for (const InterfaceOverview& each : interfaces) {
-        list.push_back(JsonMembers{{"interface", each.name},
-                                   {"system", each.system},
-                                   {"dhcp", each.dhcp ? Json(*each.dhcp) : Json(nullptr)},
-                                   {"state", textOrNull(each.state)},
-                                   {"address", textOrNull(each.address)},
-                                   {"servers", JsonList(each.servers.begin(), each.servers.end())},
-                                   {"configurationName", textOrNull(each.configurationName)}});
+        JsonList unknownKeys;
+        for (const Field& field : unknownFields(each, now)) {
+            unknownKeys.push_back(std::string(field.key));
+        }
+        if (!each.active) {
+            unknownKeys.push_back("link");
+        }
+        if (!each.leases) {
+            unknownKeys.push_back("leases");
+        }
+        list.push_back(JsonMembers{
+            {"interface", each.name},
+            {"system", each.system},
+            {"dhcp", boolJson(each.dhcp)},
+            {"state", stateJson(stateOf(each, now))},
+            {"link", boolJson(each.active)},
+            {"client", textJson(clientOf(each))},
+            {"address", textJson(addressOf(each, now))},
+            {"expires", momentJson(endOf(each))},
+            {"servers", each.servers ? Json(JsonList(each.servers->begin(), each.servers->end()))
+                                     : Json(nullptr)},
+            {"configurationName", textJson(each.configurationName)},
+            {"leases", leasesJson(each, now)},
+            {"unknown", std::move(unknownKeys)}});
     }
     return jsonText(JsonMembers{{"interfaces", std::move(list)}});
+}
+
+std::string unknownText(const std::vector<InterfaceOverview>& interfaces, std::int64_t now) {
+    // What no server tells is not a matter of the interface: without names, the notes of
+    // many servers are one.
+    std::vector<std::string> ofServer;
+    std::vector<Said> ofMachine;
+    for (const Field& field : fields) {
+        const bool lacking = std::any_of(
+            interfaces.begin(), interfaces.end(), [&field, now](const InterfaceOverview& each) {
+                const auto unknowns = unknownFields(each, now);
+                return !each.leases &&
+                       std::any_of(unknowns.begin(), unknowns.end(), [&field](const Field& other) {
+                           return other.heading == field.heading;
+                       });
+            });
+        if (lacking) {
+            ofServer.emplace_back(field.heading);
+        }
+    }
+    for (const InterfaceOverview& each : interfaces) {
+        std::vector<std::string> headings;
+        for (const Field& field : unknownFields(each, now)) {
+            headings.emplace_back(field.heading);
+        }
+        if (each.leases && !headings.empty()) {
+            say(": nothing tells " + enumeration(headings), nameOf(each), ofMachine);
+        }
+    }
+    std::string text;
+    if (!ofServer.empty()) {
+        text = "cimdhcp: note: the server does not tell " + enumeration(ofServer) + '\n';
+    }
+    for (const Said& said : ofMachine) {
+        text += "cimdhcp: note: " + shortList(said.subjects) + said.what + '\n';
+    }
+    return text;
 }
 
 }  // namespace cimdhcp

@@ -1,16 +1,21 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
 #include <optional>
-#include <span>
 #include <string>
 #include <vector>
 
-#include "client/Client.h"
+#include "client/MachineInterfaces.h"
 #include "text/Columns.h"
 #include "text/Style.h"
 
 namespace cimdhcp {
+
+class Client;
+
+// `now` is the moment of the look, in seconds since the epoch: states and the ends of leases
+// are told from it.
 
 /// Asks the provider for what it serves. Throws Failure for any response that is neither
 /// OK nor says that the class is not served.
@@ -18,19 +23,23 @@ namespace cimdhcp {
 
 /// The interfaces as a table, with a line below it when none of them uses DHCP;
 /// that line alone when there are none. The system stands in a column of its own
-/// when not all of them are the host's.
+/// when not all of them are the host's. What there is not is "-", what is not known "?".
 [[nodiscard]] std::string overviewTable(const std::vector<InterfaceOverview>& interfaces,
-                                        std::optional<std::size_t> width, const Style& style = {});
+                                        std::int64_t now, std::optional<std::size_t> width,
+                                        const Style& style = {});
 
 /// All columns, that of the system first.
-[[nodiscard]] const std::vector<Column<InterfaceOverview>>& overviewColumns();
+[[nodiscard]] std::vector<Column<InterfaceOverview>> overviewColumns(std::int64_t now);
 
-/// {"interfaces": [{"interface", "system", "dhcp", "state", "address", "servers",
-/// "configurationName"}]}; what is not known is null.
-[[nodiscard]] std::string overviewJson(const std::vector<InterfaceOverview>& interfaces);
+/// {"interfaces": [{"interface", "system", "dhcp", "state", "link", "client", "address",
+/// "expires", "servers", "configurationName", "leases", "unknown"}]}. What there is not is
+/// null, and what is not known, too, whose names "unknown" lists. Moments are
+/// {"seconds", "time"}; "leases" has what DHCPLease nodes have, each with its state.
+[[nodiscard]] std::string overviewJson(const std::vector<InterfaceOverview>& interfaces,
+                                       std::int64_t now);
 
-/// One line for what could not be read of the machine, with the first few of many;
-/// empty when there was nothing.
-[[nodiscard]] std::string remarkLine(std::span<const std::string> remarks);
+/// Notes for standard error: what of the table nothing tells. Empty when all is known.
+[[nodiscard]] std::string unknownText(const std::vector<InterfaceOverview>& interfaces,
+                                      std::int64_t now);
 
 }  // namespace cimdhcp

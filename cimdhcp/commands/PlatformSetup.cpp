@@ -132,8 +132,8 @@ void checkTree(const std::string& path) {
     auto& service = ZR::InstrumentationService::process();
     service.useSource(ZR::openTreeFile(path, tree().name));
     const auto snapshot = service.current();
-    if (snapshot->nodes().empty() && !snapshot->remarks().empty()) {
-        throw Failure(ExitStatus::notLoaded, printable(snapshot->remarks().front()));
+    if (snapshot->nodes().empty() && !snapshot->diagnostics().empty()) {
+        throw Failure(ExitStatus::notLoaded, printable(snapshot->diagnostics().front().text));
     }
 }
 

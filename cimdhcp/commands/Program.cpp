@@ -14,6 +14,7 @@
 #include "client/Installation.h"
 #include "commands/Check.h"
 #include "commands/ClientCommands.h"
+#include "commands/Findings.h"
 #include "commands/PlatformSetup.h"
 #include "commands/RemoteRun.h"
 #include "commands/Serve.h"
@@ -35,22 +36,10 @@ namespace {
 /// How long the service processor may take.
 constexpr std::chrono::seconds patience(1);
 
-/// No request of the provider waits for the service processor, whose response comes later.
-/// This program ends after one request, and so waits: a first request makes the provider
-/// send its own to the service processor; a further one is sent after it, and its response
-/// awaited, which comes after the response to the provider.
-void awaitServiceProcessor(Client& client) {
-    if (!ZR::InstrumentationService::process().awaiting()) {
-        return;
-    }
-    static_cast<void>(client.enumerateNames(client.classPath("QVXZR_DHCPProtocolEndpoint")));
-    ZR::InstrumentationService(ZR::openLiveSource()).settle(patience);
-}
-
 std::unique_ptr<EmbeddedClient> openClient(const Options& options) {
     auto client = std::make_unique<EmbeddedClient>(
         findDirectories(options, installations(executableFile())), options.nameSpace);
-    awaitServiceProcessor(*client);
+    client->awaitServiceProcessor(patience);
     return client;
 }
 
@@ -78,11 +67,12 @@ class Execution {
     void operator()(const ServeCommand& command) const {
         tellOfTree();
         const auto client = openClient(line_.options);
-        serve(command, *client, outputs_.out);
+        serve(command, client->manager(), outputs_.out);
     }
 
     void operator()(const CheckCommand& /*command*/) const {
-        const auto findings = check(line_.options, installations(executableFile()));
+        const auto findings =
+            check(line_.options, installations(executableFile()), presentation_.now);
         outputs_.out << (presentation_.json() ? findingsJson(findings) : findingsText(findings));
         if (!isGood(findings)) {
             throw Failure(ExitStatus::notDone, "something is wrong; see the list");
@@ -101,7 +91,7 @@ class Execution {
         const auto client = openClient(line_.options);
         const Outcome outcome = carryOut(line_.command, *client, presentation_);
         outputs_.out << outcome.text;
-        outputs_.err << outcome.remarks;
+        outputs_.err << outcome.diagnostics;
         if (outcome.failure) {
             throw Failure(*outcome.failure);
         }
@@ -109,8 +99,8 @@ class Execution {
 
   private:
     void tell(const ZR::Snapshot& snapshot) const {
-        for (const std::string& remark : snapshot.remarks()) {
-            outputs_.err << "cimdhcp: " << printable(remark) << '\n';
+        for (const ZR::Diagnostic& diagnostic : snapshot.diagnostics()) {
+            outputs_.err << "cimdhcp: " << printable(diagnostic.text) << '\n';
         }
     }
 
@@ -125,6 +115,11 @@ class Execution {
     const Presentation& presentation_;
     const Outputs& outputs_;
 };
+
+std::int64_t secondsNow() {
+    const auto now = std::chrono::system_clock::now().time_since_epoch();
+    return std::chrono::floor<std::chrono::seconds>(now).count();
+}
 
 Style styleFor(const Options& options, bool terminal) {
     return {!options.noHeader,
@@ -141,6 +136,7 @@ Presentation presentationOf(const CommandLine& line, const Outputs& outputs) {
     presentation.count = options.count;
     presentation.comments =
         options.format == Format::mof || std::holds_alternative<GraphCommand>(line.command);
+    presentation.now = secondsNow();
     return presentation;
 }
 

@@ -111,7 +111,7 @@ ExitStatus runRemotely(const CommandLine& line, const Presentation& presentation
                            : failure;
         }
         outputs.out << outcome.text;
-        outputs.err << outcome.remarks;
+        outputs.err << outcome.diagnostics;
         if (outcome.failure) {
             throw Failure(*outcome.failure);
         }

@@ -5,6 +5,10 @@
 #include <utility>
 #include <vector>
 
+#include "cimom/Instance.h"
+#include "client/Client.h"
+#include "client/MachineInterfaces.h"
+#include "client/Response.h"
 #include "commands/RenameFiles.h"
 #include "commands/RenameRefusals.h"
 #include "text/DisplayText.h"

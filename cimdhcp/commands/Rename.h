@@ -3,9 +3,10 @@
 #include <string>
 
 #include "arguments/Commands.h"
-#include "client/Client.h"
 
 namespace cimdhcp {
+
+class Client;
 
 /// What a rename did.
 struct RenameReport {

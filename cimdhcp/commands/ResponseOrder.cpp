@@ -5,6 +5,7 @@
 #include <utility>
 
 #include "cimom/ObjectPathText.h"
+#include "client/Response.h"
 #include "text/Columns.h"
 #include "text/NaturalOrder.h"
 #include "text/ValueMeaning.h"

@@ -2,9 +2,9 @@
 
 #include <string>
 
-#include "client/Response.h"
-
 namespace cimdhcp {
+
+struct Response;
 
 /// Sorts the paths of a response by their text, or its instances by PATH or one of their
 /// properties; instances without the property come last. Throws Failure when no instance

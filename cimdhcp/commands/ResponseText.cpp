@@ -4,10 +4,12 @@
 #include <cstdint>
 #include <utility>
 
+#include "cimom/ClassDeclaration.h"
 #include "cimom/ObjectPathText.h"
+#include "client/Response.h"
 #include "client/StatusMessage.h"
 #include "text/DisplayText.h"
-#include "text/JsonText.h"
+#include "text/InstanceJson.h"
 #include "text/MofText.h"
 #include "text/ValueMeaning.h"
 

@@ -5,10 +5,11 @@
 #include <string>
 
 #include "client/ClassLookup.h"
-#include "client/Response.h"
 #include "text/Style.h"
 
 namespace cimdhcp {
+
+struct Response;
 
 /// The response for a person: a path per line, or a block per instance with its
 /// path and below it "Property = value (meaning)", aligned; properties that are

@@ -144,13 +144,13 @@ Listening readListening(const std::string& text) {
     return listening;
 }
 
-void serve(const ServeCommand& command, EmbeddedClient& client, std::ostream& out) {
+void serve(const ServeCommand& command, cimom::ObjectManager& manager, std::ostream& out) {
     const sigset_t signals = blockEndSignals();
     try {
         // Shorter than service managers wait before they kill.
         constexpr std::chrono::seconds patience(5);
         std::optional<EndInTime> end;
-        cimom::wbem::Server server(client.manager(), settingsOf(command), log);
+        cimom::wbem::Server server(manager, settingsOf(command), log);
         log(cimom::wbem::LogKind::notice, "listening on " + server.url());
         out << "Listening on " << server.url() << std::endl;
         int signal = 0;

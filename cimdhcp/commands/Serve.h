@@ -6,7 +6,7 @@
 #include <string>
 
 #include "arguments/Commands.h"
-#include "client/EmbeddedClient.h"
+#include "cimom/Forward.h"
 
 namespace cimdhcp {
 
@@ -24,6 +24,6 @@ struct Listening {
 /// Runs the WBEM server until the process gets SIGTERM or SIGINT, which it blocks
 /// in this thread. Prints one line when the server accepts connections, and logs the rest.
 /// Throws Failure when the server cannot start.
-void serve(const ServeCommand& command, EmbeddedClient& client, std::ostream& out);
+void serve(const ServeCommand& command, cimom::ObjectManager& manager, std::ostream& out);
 
 }  // namespace cimdhcp

@@ -24,6 +24,8 @@ template <typename Row>
 struct Column {
     std::string heading;
     std::function<std::string(const Row&)> cell;
+    /// What rows are sorted by, in natural order; none: by the cell.
+    std::function<std::string(const Row&)> order{};
 };
 
 template <typename Row>
@@ -50,14 +52,15 @@ Table tableOf(const std::vector<Column<Row>>& columns, const std::vector<Row>& r
     return table;
 }
 
-/// Sorts records by what a column shows; rows that show the same keep their order.
+/// Sorts records by a column; rows between which it makes no difference keep their order.
 /// Throws Failure when there is no such column.
 template <typename Row>
 void sortBy(const std::string& wanted, const std::vector<Column<Row>>& columns,
             std::vector<Row>& rows) {
-    const auto& cell = columns[columnNamed(wanted, headingsOf(columns))].cell;
+    const Column<Row>& column = columns[columnNamed(wanted, headingsOf(columns))];
+    const auto& key = column.order ? column.order : column.cell;
     std::stable_sort(rows.begin(), rows.end(),
-                     [&cell](const Row& a, const Row& b) { return comesBefore(cell(a), cell(b)); });
+                     [&key](const Row& a, const Row& b) { return comesBefore(key(a), key(b)); });
 }
 
 }  // namespace cimdhcp

@@ -7,8 +7,6 @@
 #include <variant>
 #include <vector>
 
-#include "cimom/Instance.h"
-
 namespace cimdhcp {
 
 struct Json;
@@ -28,11 +26,6 @@ struct Json : std::variant<std::nullptr_t, bool, std::int64_t, std::uint64_t, do
 
 /// The text, or null for an empty one.
 [[nodiscard]] Json textOrNull(const std::string& text);
-
-/// {"path", "class", "properties": {NAME: {"type", "value"}}}. What is null stays
-/// null. References are path texts, embedded instances objects of this form, and reals
-/// that are not numbers the texts "NaN", "INF" and "-INF".
-[[nodiscard]] Json instanceJson(const cimom::Instance& instance);
 
 /// The value, indented by two blanks, with a line feed at its end; bytes that are not
 /// UTF-8 become U+FFFD.

@@ -19,6 +19,7 @@ struct Presentation {
     std::optional<std::string> sort;  ///< by this column or property
     bool comments = false;            ///< the output is in a language with "//" comments
     bool count = false;               ///< the number of results alone
+    std::int64_t now = 0;             ///< what moments are told from; seconds since the epoch
 
     [[nodiscard]] bool json() const noexcept { return format == Format::json; }
 

@@ -5,6 +5,7 @@
 #include <string_view>
 #include <variant>
 
+#include "cimom/ClassDeclaration.h"
 #include "cimom/ObjectPathText.h"
 #include "text/IntegerText.h"
 #include "text/MofText.h"

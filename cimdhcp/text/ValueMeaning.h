@@ -3,7 +3,7 @@
 #include <optional>
 #include <string>
 
-#include "cimom/ClassRepository.h"
+#include "cimom/Value.h"
 
 namespace cimdhcp {
 

@@ -7,11 +7,7 @@
 #include <unordered_map>
 
 #include "broker/BrokerMemory.h"
-
-namespace cimom {
-class ClassRepository;
-class RequestHandler;
-}  // namespace cimom
+#include "cimom/Forward.h"
 
 namespace cimom::broker {
 

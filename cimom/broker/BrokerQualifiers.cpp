@@ -2,7 +2,9 @@
 
 #include "broker/Conversion.h"
 #include "broker/RequestScope.h"
+#include "broker/objects/BrokerObjectPath.h"
 #include "broker/objects/BrokerStatus.h"
+#include "cimom/ClassDeclaration.h"
 #include "cimom/ClassRepository.h"
 
 namespace cimom::broker {

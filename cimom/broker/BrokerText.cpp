@@ -10,7 +10,9 @@
 #include "broker/objects/BrokerEnumeration.h"
 #include "broker/objects/BrokerError.h"
 #include "broker/objects/BrokerInstance.h"
+#include "broker/objects/BrokerObjectPath.h"
 #include "broker/objects/BrokerResult.h"
+#include "cimom/ObjectPath.h"
 #include "cimom/ObjectPathText.h"
 
 namespace cimom::broker {

@@ -1,7 +1,5 @@
 #include "broker/BrokerTypes.h"
 
-#include "cimom/ClassDeclaration.h"
-
 namespace cimom::broker {
 
 std::optional<Type> cimType(CMPIType scalarType) noexcept {
@@ -85,25 +83,6 @@ CMPIType cmpiType(Type type) noexcept {
 CMPIType cmpiType(Type type, bool isArray) noexcept {
     const CMPIType scalar = cmpiType(type);
     return isArray ? static_cast<CMPIType>(scalar | CMPI_ARRAY) : scalar;
-}
-
-bool fits(const PropertyDeclaration& property, CMPIType type) noexcept {
-    if (type == CMPI_null) {
-        return true;
-    }
-    if (isArrayType(type) != property.isArray) {
-        return false;
-    }
-    const auto given = cimType(withoutArray(type));
-    if (!given) {
-        return false;
-    }
-    if (*given == property.type) {
-        return true;
-    }
-    return *given == Type::instance && property.type == Type::string &&
-           (property.qualifier("EmbeddedInstance") != nullptr ||
-            property.qualifier("EmbeddedObject") != nullptr);
 }
 
 CMPIValue plainValue(const CMPIValue* value, Type type) noexcept {

@@ -5,11 +5,7 @@
 #include <cstring>
 #include <optional>
 
-#include "cimom/Value.h"
-
-namespace cimom {
-struct PropertyDeclaration;
-}
+#include "cimom/Type.h"
 
 namespace cimom::broker {
 
@@ -26,10 +22,6 @@ namespace cimom::broker {
 
 [[nodiscard]] CMPIType cmpiType(Type type) noexcept;
 [[nodiscard]] CMPIType cmpiType(Type type, bool isArray) noexcept;
-
-/// Whether a value of the CMPI type can be the property's. An embedded instance
-/// fits a text property that is declared to hold one.
-[[nodiscard]] bool fits(const PropertyDeclaration& property, CMPIType type) noexcept;
 
 /// Reads one member of a provider's value. The pointer may be the address of a
 /// plain variable of the member's type, as C code passes it: it is aligned for

@@ -10,8 +10,11 @@
 #include "broker/objects/BrokerInstance.h"
 #include "broker/objects/BrokerObjectPath.h"
 #include "broker/objects/BrokerStatus.h"
+#include "cimom/ClassDeclaration.h"
 #include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
 #include "cimom/Requests.h"
+#include "cimom/Results.h"
 
 namespace cimom::broker {
 

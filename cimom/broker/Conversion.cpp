@@ -8,6 +8,9 @@
 #include "broker/BrokerTypes.h"
 #include "broker/objects/BrokerArray.h"
 #include "broker/objects/BrokerDateTime.h"
+#include "broker/objects/BrokerInstance.h"
+#include "broker/objects/BrokerObjectPath.h"
+#include "cimom/Instance.h"
 
 namespace cimom::broker {
 

@@ -4,11 +4,13 @@
 
 #include <stdexcept>
 
-#include "broker/objects/BrokerInstance.h"
-#include "broker/objects/BrokerObjectPath.h"
-#include "cimom/Instance.h"
+#include "cimom/Forward.h"
 
 namespace cimom::broker {
+
+class Arena;
+struct InstanceRecord;
+struct PathRecord;
 
 /// A value of the model that its type cannot hold, e.g. 300 for a uint8 or a
 /// text that is not a datetime. what() tells name, value and type.

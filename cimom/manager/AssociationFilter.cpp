@@ -3,6 +3,8 @@
 #include <algorithm>
 #include <string_view>
 
+#include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
 #include "cimom/Names.h"
 #include "manager/PathMatch.h"
 

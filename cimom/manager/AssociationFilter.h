@@ -4,8 +4,7 @@
 #include <string>
 #include <vector>
 
-#include "cimom/ClassRepository.h"
-#include "cimom/Instance.h"
+#include "cimom/Forward.h"
 
 namespace cimom {
 

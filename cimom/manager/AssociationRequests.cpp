@@ -2,6 +2,7 @@
 // to be filtered.
 #include <algorithm>
 
+#include "cimom/ClassDeclaration.h"
 #include "manager/AssociationFilter.h"
 #include "manager/ObjectManagerImplementation.h"
 

@@ -1,6 +1,8 @@
 // Requests about instances: which providers are asked, and how.
 #include <algorithm>
 
+#include "broker/objects/BrokerInstance.h"
+#include "cimom/ClassDeclaration.h"
 #include "manager/ObjectManagerImplementation.h"
 #include "manager/PathMatch.h"
 #include "manager/RequestPath.h"

@@ -6,6 +6,7 @@
 #include <array>
 #include <utility>
 
+#include "cimom/ClassDeclaration.h"
 #include "manager/ObjectManagerImplementation.h"
 #include "manager/RequestPath.h"
 

@@ -7,8 +7,11 @@
 #include <utility>
 #include <vector>
 
+#include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
 #include "cimom/Names.h"
 #include "cimom/ObjectManager.h"
+#include "cimom/Results.h"
 #include "manager/ProviderCall.h"
 #include "manager/Providers.h"
 #include "manager/RequestedObjects.h"

@@ -4,6 +4,8 @@
 #include <optional>
 #include <utility>
 
+#include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
 #include "cimom/Names.h"
 
 namespace cimom {

@@ -2,8 +2,7 @@
 
 #include <string_view>
 
-#include "cimom/ClassRepository.h"
-#include "cimom/Instance.h"
+#include "cimom/Forward.h"
 
 namespace cimom {
 

@@ -1,9 +1,7 @@
 #pragma once
 
 #include <cmpift.h>
-#include <cxxabi.h>
 
-#include <exception>
 #include <optional>
 #include <string>
 #include <utility>
@@ -13,30 +11,14 @@
 #include "broker/Conversion.h"
 #include "broker/RequestScope.h"
 #include "broker/objects/BrokerContext.h"
+#include "broker/objects/BrokerObjectPath.h"
 #include "broker/objects/BrokerResult.h"
+#include "cimom/Forward.h"
+#include "cimom/ObjectPath.h"
 #include "cimom/Requests.h"
+#include "manager/GuardedCall.h"
 
 namespace cimom {
-
-class ClassRepository;
-
-/// The model of a provider's status; reads it while the message still lives.
-[[nodiscard]] Status statusFrom(const CMPIStatus& status);
-
-/// Runs a function of a provider; whatever it throws becomes a status that
-/// names it. The unwinding of a cancelled thread passes.
-template <typename Call>
-Status guardedCall(const std::string& who, Call&& call) {
-    try {
-        return statusFrom(std::forward<Call>(call)());
-    } catch (const abi::__forced_unwind&) {
-        throw;
-    } catch (const std::exception& exception) {
-        return {CMPI_RC_ERR_FAILED, who + " threw an exception: " + exception.what()};
-    } catch (...) {
-        return {CMPI_RC_ERR_FAILED, who + " threw an exception of an unknown kind"};
-    }
-}
 
 /// A property list as CMPI passes it: ended by a null pointer; null for none.
 class PropertyNames {
@@ -65,9 +47,6 @@ struct CallOutcome {
 };
 
 [[nodiscard]] CallOutcome missingSlot(const std::string& provider, const char* slot);
-
-/// The status when a request is nested too deep; OK otherwise.
-[[nodiscard]] Status checkDepth();
 
 /// The status of several calls as one, and what was counted. `exact`: the client named
 /// the class that was asked, whose status is that of the whole.

@@ -6,7 +6,7 @@
 #include "broker/RequestScope.h"
 #include "broker/objects/BrokerContext.h"
 #include "cimom/Registrations.h"
-#include "manager/ProviderCall.h"
+#include "manager/GuardedCall.h"
 
 namespace cimom {
 

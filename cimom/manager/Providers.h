@@ -10,14 +10,13 @@
 #include <vector>
 
 #include "broker/Broker.h"
+#include "cimom/Forward.h"
 #include "cimom/Status.h"
 #include "manager/ProviderLibrary.h"
 
 namespace cimom {
 
-class ClassRepository;
 class Providers;
-class RequestHandler;
 
 /// One provider: a name in the factories of one library. Its tables are made
 /// when first asked for, once per kind. Safe for concurrent use.

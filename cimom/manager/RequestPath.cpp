@@ -5,6 +5,10 @@
 
 #include "broker/Arena.h"
 #include "broker/Conversion.h"
+#include "cimom/ClassDeclaration.h"
+#include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
+#include "cimom/Names.h"
 #include "cimom/ObjectPathText.h"
 
 namespace cimom {

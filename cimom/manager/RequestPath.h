@@ -3,8 +3,7 @@
 #include <string>
 #include <vector>
 
-#include "cimom/ClassRepository.h"
-#include "cimom/Instance.h"
+#include "cimom/Forward.h"
 #include "cimom/Status.h"
 
 namespace cimom {

@@ -4,6 +4,9 @@
 #include <memory>
 #include <utility>
 
+#include "cimom/ClassDeclaration.h"
+#include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
 #include "cimom/Names.h"
 
 namespace cimom {

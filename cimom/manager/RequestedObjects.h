@@ -6,9 +6,7 @@
 #include <utility>
 #include <vector>
 
-#include "cimom/ClassRepository.h"
-#include "cimom/Instance.h"
-#include "cimom/ObjectPath.h"
+#include "cimom/Forward.h"
 #include "cimom/ResultReceiver.h"
 
 namespace cimom {

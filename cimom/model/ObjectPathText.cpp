@@ -8,6 +8,7 @@
 #include <type_traits>
 #include <utility>
 
+#include "cimom/Instance.h"
 #include "cimom/Names.h"
 #include "cimom/Utf8.h"
 

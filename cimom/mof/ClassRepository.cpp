@@ -9,6 +9,8 @@
 #include <unordered_map>
 #include <utility>
 
+#include "cimom/ClassDeclaration.h"
+#include "cimom/MofError.h"
 #include "cimom/Names.h"
 #include "mof/ClassResolver.h"
 #include "mof/MofParser.h"

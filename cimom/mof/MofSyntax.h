@@ -8,7 +8,7 @@
 #include <vector>
 
 #include "cimom/MofError.h"
-#include "cimom/Value.h"
+#include "cimom/Type.h"
 
 /// What a MOF text says (DSP0004, annex A), before any of it is checked against
 /// other declarations.

@@ -8,6 +8,7 @@
 
 #include "cimom/MofError.h"
 #include "cimom/Names.h"
+#include "cimom/Value.h"
 
 namespace cimom {
 

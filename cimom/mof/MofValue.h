@@ -2,6 +2,7 @@
 
 #include <string>
 
+#include "cimom/Forward.h"
 #include "mof/MofSyntax.h"
 
 namespace cimom {

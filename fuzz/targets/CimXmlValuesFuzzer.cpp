@@ -1,5 +1,6 @@
 // Instances and paths as elements of CIM-XML.
 #include "Input.h"
+#include "cimom/Instance.h"
 #include "cimxml/Errors.h"
 #include "cimxml/ObjectReader.h"
 #include "cimxml/ObjectWriter.h"

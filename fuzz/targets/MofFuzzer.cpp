@@ -2,7 +2,9 @@
 #include <algorithm>
 
 #include "Input.h"
+#include "cimom/ClassDeclaration.h"
 #include "cimom/ClassRepository.h"
+#include "cimom/MofError.h"
 
 namespace {
 

@@ -6,7 +6,9 @@
 #include "broker/Broker.h"
 #include "broker/Conversion.h"
 #include "broker/RequestScope.h"
+#include "broker/objects/BrokerObjectPath.h"
 #include "cimom/ClassRepository.h"
+#include "cimom/Names.h"
 #include "cimom/ObjectPathText.h"
 #include "providerutilities/ProviderUtilities.h"
 

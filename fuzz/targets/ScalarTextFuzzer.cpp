@@ -1,5 +1,6 @@
 // A byte that names a type, and the text of a value: of CIM-XML, of a date, and of what
 // a person types.
+#include "cimom/ClassDeclaration.h"
 #include "cimxml/ScalarText.h"
 
 #include <cmath>

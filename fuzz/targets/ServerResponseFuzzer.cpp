@@ -1,5 +1,7 @@
 // The responses of a server that others wrote, as the remote client reads them.
 #include "Input.h"
+#include "cimom/ClassDeclaration.h"
+#include "cimom/Instance.h"
 #include "cimxml/ClassReader.h"
 #include "cimxml/Errors.h"
 #include "cimxml/ObjectWriter.h"

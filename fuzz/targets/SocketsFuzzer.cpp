@@ -1,10 +1,10 @@
-// The tables of sockets under /proc/net.
+// The tables of sockets under /proc/net, and the status of a process beside them.
 #include "kernel/Sockets.h"
 
 #include <array>
-#include <set>
 
 #include "Input.h"
+#include "clients/ProcessStatus.h"
 #include "support/Addresses.h"
 
 namespace {
@@ -30,18 +30,21 @@ int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
         for (const auto& address : {socket.address, socket.peer}) {
             fuzz::require(!address || address->isIPv4(), "an end is an IPv4 address");
         }
-        again +=
-            "  11: " + endPoint(socket.address, 68) + ' ' + endPoint(socket.peer, 67) + " 07\n";
+        again += "  11: " + endPoint(socket.address, 68) + ' ' + endPoint(socket.peer, 67) +
+                 " 07 00000000:00000000 00:00000000 00000000 " + std::to_string(socket.user) + "\n";
     }
     fuzz::require(ZR::Live::parseUdpSockets(again) == sockets, "sockets survive being written");
 
-    const auto links = ZR::Live::parsePacketLinks(text);
+    const auto heard = ZR::Live::parsePacketSockets(text);
     again = "sk               RefCnt Type Proto  Iface R Rmem   User   Inode\n";
-    for (const std::uint32_t link : links) {
-        again += "0000000000000000 3      3    0003   " + std::to_string(link) + "     1 0 0 1\n";
+    for (const auto& socket : heard) {
+        fuzz::require(socket.link != 0, "a socket hears a link");
+        again += "0000000000000000 3      3    0003   " + std::to_string(socket.link) +
+                 "     1 0 0 " + std::to_string(socket.inode) + "\n";
     }
-    fuzz::require(ZR::Live::parsePacketLinks(again) == links, "links survive being written");
-    fuzz::require(std::set(links.begin(), links.end()).size() == links.size(),
-                  "each link is there once");
+    fuzz::require(ZR::Live::parsePacketSockets(again) == heard, "sockets survive being written");
+
+    const auto status = ZR::Live::parseProcessStatus(text);
+    fuzz::require(!status || status->state != '\0', "a process has a state");
     return 0;
 }

@@ -3,6 +3,8 @@
 #include <algorithm>
 #include <utility>
 
+#include "InterfaceDiagnostics.h"
+#include "LeaseNodes.h"
 #include "Precedence.h"
 #include "kernel/InterfaceRules.h"
 
@@ -70,8 +72,18 @@ std::vector<Decision> decide(InterfaceView view) {
     return decisions;
 }
 
+const Decision* decisionOn(Properties property, const std::vector<Decision>& decisions) {
+    const auto found =
+        std::find_if(decisions.begin(), decisions.end(),
+                     [&](const Decision& decision) { return decision.property == property; });
+    return found == decisions.end() ? nullptr : &*found;
+}
+
 std::shared_ptr<const Snapshot> decide(MachineFacts facts, std::int64_t now, Explain explain) {
-    const Machine machine{std::move(facts), now};
+    return decide(Machine{std::move(facts), now}, explain);
+}
+
+std::shared_ptr<const Snapshot> decide(const Machine& machine, Explain explain) {
     SnapshotBuilder builder;
     if (explain == Explain::Yes) {
         builder.origin("kernel: the name of the system");
@@ -83,17 +95,23 @@ std::shared_ptr<const Snapshot> decide(MachineFacts facts, std::int64_t now, Exp
                                            : PropertyValue(machine.hostName()));
     builder.property(Properties::NameMaxLength, hostNameMaxLength);
     const auto network = builder.add(computer, "Network", "Network");
+    std::vector<Diagnostic> diagnostics = machine.diagnostics();
     for (const InterfaceView& view : machine.interfaces()) {
-        builder.add(network, "NetworkInterface", std::string{describe(*view.link)});
-        for (Decision& decision : decide(view)) {
+        const auto interface =
+            builder.add(network, "NetworkInterface", std::string{describe(*view.link)});
+        const std::vector<Decision> decisions = decide(view);
+        for (const Decision& decision : decisions) {
             // A link can be renamed, but not by a client of this tree: the kernel forgets
             // the new name at the next start, and leases and settings are found by name.
             const bool readOnly = decision.property == Properties::Name;
             if (explain == Explain::Yes) {
                 builder.origin(describe(decision.origin) + ": " + std::string{decision.reason});
             }
-            builder.property(decision.property, std::move(decision.value), readOnly);
+            builder.property(decision.property, decision.value, readOnly);
         }
+        addLeases({.machine = machine, .view = view, .decisions = decisions, .node = interface},
+                  explain, builder);
+        addDiagnostics(machine, view, decisions, diagnostics);
     }
     if (machine.serviceProcessor()) {
         if (explain == Explain::Yes) {
@@ -101,8 +119,8 @@ std::shared_ptr<const Snapshot> decide(MachineFacts facts, std::int64_t now, Exp
         }
         addServiceProcessor(*machine.serviceProcessor(), builder);
     }
-    for (const std::string& diagnostic : machine.diagnostics()) {
-        builder.remark(diagnostic);
+    for (Diagnostic& diagnostic : diagnostics) {
+        builder.diagnostic(std::move(diagnostic));
     }
     return builder.build();
 }

@@ -30,9 +30,17 @@ struct Decision {
 /// Decides all properties of one interface, in the order of the table.
 [[nodiscard]] std::vector<Decision> decide(InterfaceView view);
 
-/// The tree of a machine: the computer, its network, and the interfaces in it; behind
-/// it the service processor, where there is one; and what could not be read as remarks.
-/// Depends on nothing but the facts and the time, in seconds since the epoch.
+/// The decision on a property; null when it was left out.
+[[nodiscard]] const Decision* decisionOn(NodeLexicon::Properties property,
+                                         const std::vector<Decision>& decisions);
+
+/// The tree of a machine: the computer, its network, the interfaces in it, and below each its
+/// leases; behind it the service processor, where there is one; and what could not be read,
+/// or is not as it looks, as diagnostics. Depends on nothing but the facts and their time.
+[[nodiscard]] std::shared_ptr<const Snapshot> decide(const Machine& machine,
+                                                     Explain explain = Explain::No);
+
+/// The same. `now`: seconds since the epoch.
 [[nodiscard]] std::shared_ptr<const Snapshot> decide(MachineFacts facts, std::int64_t now,
                                                      Explain explain = Explain::No);
 

@@ -11,6 +11,7 @@
 
 #include "Decide.h"
 #include "StateReaders.h"
+#include "clients/Processes.h"
 #include "formats/Files.h"
 #include "formats/SystemErrors.h"
 #include "ipmi/IpmiDevice.h"
@@ -69,10 +70,11 @@ void markWireless(const Roots& roots, std::vector<Link>& links) {
 }
 
 /// Several readers may report the same.
-void removeRepeated(std::vector<std::string>& diagnostics) {
+void removeRepeated(std::vector<Diagnostic>& diagnostics) {
     std::unordered_set<std::string> met;
-    std::erase_if(diagnostics,
-                  [&](const std::string& diagnostic) { return !met.insert(diagnostic).second; });
+    std::erase_if(diagnostics, [&](const Diagnostic& diagnostic) {
+        return !met.insert(diagnostic.text).second;
+    });
 }
 
 void reportToLog(std::string_view message) {
@@ -88,7 +90,8 @@ LiveMachine::LiveMachine(Surroundings surroundings)
       processor_(
           surroundings_.ipmi ? std::move(surroundings_.ipmi) : ipmiDevice(surroundings_.roots),
           surroundings_.uptime),
-      places_(fixedPlaces(surroundings_.roots)) {
+      places_(fixedPlaces(surroundings_.roots)),
+      unannounced_(surroundings_.roots) {
     if (!surroundings_.report) {
         surroundings_.report = reportToLog;
     }
@@ -96,18 +99,25 @@ LiveMachine::LiveMachine(Surroundings surroundings)
 
 bool LiveMachine::changed() {
     // The conversation with the service processor goes on only when this is called.
-    return processor_.changed() || monitor_.changed() || socketsChanged() ||
+    return processor_.changed() || monitor_.changed() || changedByTime() ||
            (troubled_ && surroundings_.uptime() >= troubleRest_);
 }
 
-/// Nothing tells when a socket is closed. Where a socket is all that was seen of a client,
-/// the sockets are therefore read with every request.
-bool LiveMachine::socketsChanged() const {
-    if (!sockets_) {
-        return false;
+/// What changes though nothing tells of it: leases end, and once a second it is looked
+/// whether clients came. A clock that was set back makes all times in the snapshot doubtful.
+bool LiveMachine::changedByTime() {
+    const std::int64_t now = surroundings_.now();
+    if (now >= readAt_ && now < changesAt_) {
+        if (now == lookedAt_) {
+            return false;
+        }
+        lookedAt_ = now;
+        if (!unannounced_.changed()) {
+            return false;
+        }
     }
-    std::vector<std::string> ignored;  // what cannot be read shows as a change
-    return readSockets(surroundings_.roots, ignored) != sockets_;
+    monitor_.markChanged();
+    return true;
 }
 
 bool LiveMachine::awaiting() {
@@ -138,26 +148,26 @@ std::shared_ptr<const Snapshot> LiveMachine::tryToRead() {
     if (surroundings_.realProcesses) {
         watchProcesses(clients);
     }
-    sockets_.reset();
-    if (clients.socketsStandAlone()) {
-        sockets_ = clients.sockets;
-    }
     markWireless(surroundings_.roots, network.links);
     SystemName system = readSystemName();
     if (system.name.empty()) {
-        clients.diagnostics.push_back(std::move(system.diagnostic));
+        clients.diagnostics.emplace_back(std::move(system.diagnostic));
     }
     planAnotherTry(clients.diagnostics);
     // The service processor is asked again at its own pace.
     std::optional<ServiceProcessor> processor = processor_.read(clients.diagnostics);
     removeRepeated(clients.diagnostics);
     report(clients.diagnostics);
-    return decide({.hostName = std::move(system.name),
-                   .links = std::move(network.links),
-                   .addresses = std::move(network.addresses),
-                   .clients = std::move(clients),
-                   .serviceProcessor = processor},
-                  surroundings_.now(), surroundings_.explain);
+    readAt_ = surroundings_.now();
+    lookedAt_ = readAt_;
+    const Machine machine{{.hostName = std::move(system.name),
+                           .links = std::move(network.links),
+                           .addresses = std::move(network.addresses),
+                           .clients = std::move(clients),
+                           .serviceProcessor = processor},
+                          readAt_};
+    changesAt_ = machine.changesAt();
+    return decide(machine, surroundings_.explain);
 }
 
 /// Where networkd manages links, asks it for what its files do not tell.
@@ -172,7 +182,7 @@ void LiveMachine::consultNetworkd(ClientFacts& clients) {
     const NetworkdResponse response =
         surroundings_.askNetworkd(std::chrono::steady_clock::now() + networkdTime);
     if (!response.reason.empty()) {
-        clients.diagnostics.push_back(response.reason);
+        clients.diagnostics.emplace_back(response.reason);
         networkdRest_ = now + networkdPause;
         return;
     }
@@ -181,8 +191,8 @@ void LiveMachine::consultNetworkd(ClientFacts& clients) {
     }
     const auto parsed = parseNetworkdDescription(response.json);
     if (const auto* const reason = std::get_if<std::string_view>(&parsed)) {
-        clients.diagnostics.push_back("cannot use what systemd-networkd says: " +
-                                      std::string{*reason});
+        clients.diagnostics.emplace_back("cannot use what systemd-networkd says: " +
+                                         std::string{*reason});
         return;
     }
     addNetworkdDescription(std::get<std::vector<NetworkdAddress>>(parsed), clients);
@@ -191,9 +201,10 @@ void LiveMachine::consultNetworkd(ClientFacts& clients) {
 /// The end of a program may change nothing else that is watched.
 void LiveMachine::watchProcesses(const ClientFacts& clients) {
     std::vector<std::int32_t> pids;
-    pids.reserve(clients.processes.size() + clients.managers.size());
-    for (const ClientProcess& process : clients.processes) {
-        pids.push_back(process.pid);
+    for (const auto* processes : {&clients.processes, &clients.hiddenClients}) {
+        for (const ClientProcess& process : *processes) {
+            pids.push_back(process.pid);
+        }
     }
     for (const ManagerProcess& manager : clients.managers) {
         if (manager.where != ManagerProcess::Where::Elsewhere) {
@@ -209,9 +220,14 @@ ClientFacts LiveMachine::readClients() {
     for (int round = 0; round < clientRounds; ++round) {
         facts = {};
         monitor_.begin(places_, facts.diagnostics);
+        unannounced_.begin();
         for (const StateReader& reader : stateReaders()) {
             reader.read(surroundings_.roots, facts);
+            if (reader.read == readProcesses) {
+                unannounced_.keepProcesses(facts);
+            }
         }
+        unannounced_.keepSockets(facts);
         std::vector<WatchedPlace> wanted = fixedPlaces(surroundings_.roots);
         for (WatchedPlace& place : facts.places) {
             if (!isCovered(wanted, place)) {
@@ -230,12 +246,18 @@ ClientFacts LiveMachine::readClients() {
     return facts;
 }
 
-/// What was not there at the last reading may be gone at the next request.
-void LiveMachine::planAnotherTry(const std::vector<std::string>& diagnostics) {
-    const bool lasts =
-        std::all_of(diagnostics.begin(), diagnostics.end(),
-                    [&](const std::string& diagnostic) { return reported_.contains(diagnostic); });
-    troubled_ = !diagnostics.empty();
+/// What was not there at the last reading may be gone at the next request. What a file says
+/// stays as it is until the file changes.
+void LiveMachine::planAnotherTry(const std::vector<Diagnostic>& diagnostics) {
+    const auto mayEnd = [](const Diagnostic& diagnostic) {
+        return diagnostic.kind == Diagnostic::Kind::Unreadable ||
+               diagnostic.kind == Diagnostic::Kind::Denied ||
+               diagnostic.kind == Diagnostic::Kind::Untrusted;
+    };
+    const bool lasts = std::all_of(
+        diagnostics.begin(), diagnostics.end(),
+        [&](const Diagnostic& diagnostic) { return reported_.contains(diagnostic.text); });
+    troubled_ = std::any_of(diagnostics.begin(), diagnostics.end(), mayEnd);
     troubleRest_ = surroundings_.uptime();
     if (lasts) {
         troubleRest_ += troublePause;
@@ -244,13 +266,15 @@ void LiveMachine::planAnotherTry(const std::vector<std::string>& diagnostics) {
 
 /// Reports what the last reading did not report: what lasts is reported once, however
 /// often the machine is read.
-void LiveMachine::report(const std::vector<std::string>& diagnostics) {
-    for (const std::string& diagnostic : diagnostics) {
-        if (!reported_.contains(diagnostic)) {
-            surroundings_.report(diagnostic);
+void LiveMachine::report(const std::vector<Diagnostic>& diagnostics) {
+    std::unordered_set<std::string> told;
+    for (const Diagnostic& diagnostic : diagnostics) {
+        if (!reported_.contains(diagnostic.text)) {
+            surroundings_.report(diagnostic.text);
         }
+        told.insert(diagnostic.text);
     }
-    reported_ = {diagnostics.begin(), diagnostics.end()};
+    reported_ = std::move(told);
 }
 
 }  // namespace ZR::Live

@@ -2,6 +2,7 @@
 
 #include <chrono>
 #include <cstdint>
+#include <ctime>
 #include <functional>
 #include <memory>
 #include <optional>
@@ -10,6 +11,7 @@
 #include <unordered_set>
 #include <vector>
 
+#include "Unannounced.h"
 #include "clients/NetworkdBus.h"
 #include "formats/Roots.h"
 #include "ipmi/IpmiReader.h"
@@ -25,11 +27,8 @@ namespace ZR::Live {
 struct Surroundings {
     Roots roots;
     std::unique_ptr<NetlinkTransport> transport = kernelTransport();
-    /// Seconds since the epoch.
-    std::function<std::int64_t()> now = [] {
-        return static_cast<std::int64_t>(
-            std::chrono::system_clock::to_time_t(std::chrono::system_clock::now()));
-    };
+    /// Seconds since the epoch. Asked with each request.
+    std::function<std::int64_t()> now = [] { return std::int64_t{std::time(nullptr)}; };
     /// False when the process file system is one that was laid out: its numbers
     /// then are those of other processes.
     bool realProcesses = true;
@@ -58,16 +57,19 @@ class LiveMachine final : public SnapshotSource {
     [[nodiscard]] ClientFacts readClients();
     void consultNetworkd(ClientFacts& clients);
     void watchProcesses(const ClientFacts& clients);
-    [[nodiscard]] bool socketsChanged() const;
-    void planAnotherTry(const std::vector<std::string>& diagnostics);
-    void report(const std::vector<std::string>& diagnostics);
+    [[nodiscard]] bool changedByTime();
+    void planAnotherTry(const std::vector<Diagnostic>& diagnostics);
+    void report(const std::vector<Diagnostic>& diagnostics);
 
     Surroundings surroundings_;
     RtnetlinkReader reader_;
     ChangeMonitor monitor_;
     IpmiReader processor_;
     std::vector<WatchedPlace> places_;
-    std::optional<ClientSockets> sockets_;  // where nothing else tells of who has them
+    Unannounced unannounced_;
+    std::int64_t readAt_ = 0;     // when the last snapshot was made
+    std::int64_t changesAt_ = 0;  // when it is no longer true, though nothing happens
+    std::int64_t lookedAt_ = 0;   // for what nothing announces
     std::chrono::steady_clock::time_point networkdRest_;  // not to be asked before
     std::unordered_set<std::string> reported_;            // of the last reading
     bool troubled_ = false;                               // something could not be read

@@ -3,15 +3,14 @@
 #include <linux/if.h>
 
 #include <algorithm>
+#include <set>
 #include <utility>
 
+#include "LeaseRules.h"
 #include "kernel/InterfaceRules.h"
 
 namespace ZR::Live {
 namespace {
-
-// A client sets the address some moments after it took down when the lease ends.
-constexpr std::int64_t renamedTolerance = 10;  // seconds
 
 const Address* addressOf(const Lease& lease, const InterfaceView& view) {
     const auto found =
@@ -31,37 +30,114 @@ void sortByIndex(std::vector<Fact>& facts) {
     }
 }
 
-bool concerns(const ClientProcess& process, const Link& link) {
-    const bool all = process.interfaces.empty();
-    return all ? (link.flags & IFF_BROADCAST) != 0 : process.serves(link.name);
+bool contains(const std::vector<std::uint32_t>& indexes, std::uint32_t ifindex) {
+    return std::find(indexes.begin(), indexes.end(), ifindex) != indexes.end();
 }
 
-/// Whether an address is what a client made of a lease, as far as their ends tell.
-bool endsWith(const Address& address, const Lease& lease, std::int64_t now) {
-    if (!lease.expires) {
-        return false;
+/// Whether a client was told to run on named links and is known by those that it hears:
+/// the names may be old.
+bool isKnownByIndex(const ClientProcess& process) {
+    return !process.interfaces.empty() && process.heardLinks &&
+           process.heardLinks->size() >= process.interfaces.size();
+}
+
+/// The links on which running clients and managers were told to take an address by DHCP.
+class ClaimedLinks {
+  public:
+    explicit ClaimedLinks(const ClientFacts& clients) {
+        for (const ClientProcess& process : clients.processes) {
+            if (isKnownByIndex(process)) {
+                indexes_.insert(process.heardLinks->begin(), process.heardLinks->end());
+            } else {
+                names_.insert(process.interfaces.begin(), process.interfaces.end());
+            }
+        }
+        for (const LinkConfiguration& management : clients.managements) {
+            if (!management.dhcp4.value_or(false) && !management.dhcp6.value_or(false)) {
+                continue;
+            }
+            if (management.ifindex != 0) {
+                indexes_.insert(management.ifindex);
+            } else if (management.interfaceName) {
+                names_.insert(*management.interfaceName);
+            }
+        }
     }
-    if (address.validLifetime == Address::infinite) {
-        // udhcpc sets no other addresses. That they have no end tells little, so that
-        // the client must run.
-        return lease.clientAlive &&
-               (*lease.expires == Lease::never || lease.client == Client::Udhcpc);
+
+    [[nodiscard]] bool contain(const Link& link) const {
+        return (link.flags & IFF_LOOPBACK) == 0 &&
+               (indexes_.contains(link.ifindex) || names_.contains(link.name));
     }
-    if (*lease.expires == Lease::never) {
-        return false;
-    }
-    const std::int64_t difference = *lease.expires - now - address.validLifetime;
-    return difference >= -renamedTolerance && difference <= renamedTolerance;
+
+  private:
+    std::set<std::uint32_t> indexes_;
+    std::set<InterfaceName> names_;
+};
+
+/// Whether a client asks for leases of this family. dhcpcd asks for both at once.
+bool asksFor(const ClientProcess& process, bool ipv6) {
+    return process.ipv6 == ipv6 || (process.client == Client::Dhcpcd && !process.ipv6);
+}
+
+bool holdsLease(const ClientProcess& process, const InterfaceView& view) {
+    const auto isIts = [&](const Lease* lease) {
+        return lease->clientAlive && lease->client == process.client;
+    };
+    return (asksFor(process, false) &&
+            std::any_of(view.leases.begin(), view.leases.end(), isIts)) ||
+           (asksFor(process, true) && std::any_of(view.leases6.begin(), view.leases6.end(), isIts));
+}
+
+/// Whether a client says itself what it does with a link, which its process cannot tell.
+bool speaksItself(const ClientProcess& process, const InterfaceView& view) {
+    return std::any_of(view.managements.begin(), view.managements.end(),
+                       [&](const LinkConfiguration* management) {
+                           return management->client == process.client &&
+                                  (process.ipv6 ? management->dhcp6 : management->dhcp4);
+                       });
 }
 
 }  // namespace
 
-Machine::Machine(MachineFacts facts, std::int64_t now) : facts_(std::move(facts)) {
-    auto& links = facts_.links;
-    auto& addresses = facts_.addresses;
-    sortByIndex(links);
-    sortByIndex(addresses);
-    views_.reserve(links.size());
+const LinkConfiguration* InterfaceView::dhcpManagement(bool ipv6) const {
+    const auto found = std::find_if(
+        managements.begin(), managements.end(), [&](const LinkConfiguration* management) {
+            return (ipv6 ? management->dhcp6 : management->dhcp4).value_or(false);
+        });
+    return found == managements.end() ? nullptr : *found;
+}
+
+const ClientProcess* InterfaceView::process(bool ipv6) const {
+    const auto found =
+        std::find_if(processes.begin(), processes.end(),
+                     [&](const ClientProcess* process) { return process->ipv6 == ipv6; });
+    return found == processes.end() ? nullptr : *found;
+}
+
+std::optional<bool> InterfaceView::isHeardBy(const ClientProcess& process) const {
+    return process.heardLinks ? std::optional{contains(*process.heardLinks, link->ifindex)}
+                              : std::nullopt;
+}
+
+Machine::Machine(MachineFacts facts, std::int64_t now) : facts_(std::move(facts)), now_(now) {
+    sortByIndex(facts_.links);
+    sortByIndex(facts_.addresses);
+    collectInterfaces();
+    collectLeases();
+    collectManagements();
+    collectProcesses();
+    collectHidden();
+    collectSockets();
+    collectBootLease();
+    findNextChange();
+}
+
+void Machine::collectInterfaces() {
+    const auto& links = facts_.links;
+    const auto& addresses = facts_.addresses;
+    std::vector<std::span<const Address>> ofLinks;
+    ofLinks.reserve(links.size());
+    WayOut wayOut;
     auto address = addresses.begin();
     for (const Link& link : links) {
         const auto first = std::find_if(address, addresses.end(), [&](const Address& candidate) {
@@ -71,13 +147,19 @@ Machine::Machine(MachineFacts facts, std::int64_t now) : facts_(std::move(facts)
             return candidate.ifindex != link.ifindex;
         });
         address = last;
-        if (isNetworkInterface(link, first != last)) {
-            views_.push_back({.link = &link,
-                              .addresses = {first, last},
-                              .leases = {},
-                              .leases6 = {},
-                              .enslaved = isEnslaved(link),
-                              .processes = {}});
+        ofLinks.emplace_back(first, last);
+        wayOut.add(link, first != last);
+    }
+    const ClaimedLinks claimed{facts_.clients};
+    views_.reserve(links.size());
+    for (std::size_t i = 0; i < links.size(); ++i) {
+        const Link& link = links[i];
+        if (isNetworkInterface(link, !ofLinks[i].empty()) || wayOut.isBy(link) ||
+            claimed.contain(link)) {
+            InterfaceView& view = views_.emplace_back();
+            view.link = &link;
+            view.addresses = ofLinks[i];
+            view.enslaved = isEnslaved(link);
         }
     }
     byName_.resize(views_.size());
@@ -87,37 +169,24 @@ Machine::Machine(MachineFacts facts, std::int64_t now) : facts_(std::move(facts)
     std::sort(byName_.begin(), byName_.end(), [&](std::size_t a, std::size_t b) {
         return views_[a].link->name < views_[b].link->name;
     });
-    collectLeases(now);
-    collectClients();
-    collectSockets();
-    collectBootLease();
 }
 
-void Machine::collectLeases(std::int64_t now) {
-    for (const Lease& lease : facts_.clients.leases) {
-        const bool over = lease.expires && *lease.expires <= now;
-        if (lease.released || (over && !lease.outlivesEnd)) {
+void Machine::collectLeases() {
+    for (Lease& lease : facts_.clients.leases) {
+        InterfaceView* const view = lease.released ? nullptr : findLink(lease);
+        const Address* const address = view == nullptr ? nullptr : addressOf(lease, *view);
+        if (address == nullptr) {
             continue;
         }
-        InterfaceView* view = nullptr;
-        if (lease.ifindex != 0) {
-            view = find(lease.ifindex);
-        } else if (lease.interfaceName) {
-            view = find(*lease.interfaceName);
-        }
-        if (view == nullptr && lease.ifindex == 0) {
-            view = findByAddress(lease, now);
-        } else if (view != nullptr && lease.ifindex != 0 && lease.interfaceName &&
-                   view->link->name != *lease.interfaceName) {
-            continue;  // names two links
-        }
-        if (view == nullptr || addressOf(lease, *view) == nullptr) {
-            continue;
-        }
-        if (over) {
-            view->formerLease = &lease;
-        } else {
-            (lease.address.isIPv4() ? view->leases : view->leases6).push_back(&lease);
+        switch (settle(lease, *address, now_)) {
+            case Standing::Live:
+                (lease.address.isIPv4() ? view->leases : view->leases6).push_back(&lease);
+                break;
+            case Standing::Ended:
+                view->ended.push_back(&lease);
+                break;
+            case Standing::Foreign:
+                break;
         }
     }
     const auto alive = [](const Lease* lease) { return lease->clientAlive; };
@@ -127,25 +196,65 @@ void Machine::collectLeases(std::int64_t now) {
     }
 }
 
-void Machine::collectClients() {
+void Machine::collectManagements() {
     for (const LinkConfiguration& management : facts_.clients.managements) {
-        if (InterfaceView* const view = find(management.ifindex)) {
-            view->management = &management;
+        if (InterfaceView* const view = find(management)) {
+            view->managements.push_back(&management);
         }
     }
     for (const LinkConfiguration& configuration : facts_.clients.configurations) {
-        InterfaceView* const view =
-            configuration.interfaceName ? find(*configuration.interfaceName) : nullptr;
-        if (view != nullptr && view->configuration == nullptr) {
-            view->configuration = &configuration;
+        if (InterfaceView* const view = find(configuration)) {
+            view->configurations.push_back(&configuration);
         }
     }
+}
+
+void Machine::addProcess(const ClientProcess& process, InterfaceView& view) const {
+    const bool known =
+        std::find(view.processes.begin(), view.processes.end(), &process) != view.processes.end();
+    if (!known && !speaksItself(process, view)) {
+        view.processes.push_back(&process);
+    }
+}
+
+void Machine::collectProcesses() {
     for (const ClientProcess& process : facts_.clients.processes) {
-        for (InterfaceView& view : views_) {
-            if (concerns(process, *view.link)) {
-                view.processes.push_back(&process);
+        if (!process.interfaces.empty() && !isKnownByIndex(process)) {
+            for (const InterfaceName& name : process.interfaces) {
+                if (InterfaceView* const view = find(name)) {
+                    addProcess(process, *view);
+                }
             }
         }
+        // Whose the packet sockets are is not always to be known.
+        const auto& heard =
+            process.heardLinks ? *process.heardLinks : facts_.clients.sockets.packetLinks;
+        if (process.heardLinks || process.interfaces.empty()) {
+            for (const std::uint32_t ifindex : heard) {
+                if (InterfaceView* const view = find(ifindex)) {
+                    addProcess(process, *view);
+                }
+            }
+        }
+        if (process.interfaces.empty()) {
+            for (InterfaceView& view : views_) {
+                if (holdsLease(process, view)) {
+                    addProcess(process, view);
+                }
+            }
+        }
+    }
+}
+
+void Machine::collectHidden() {
+    const auto& hidden = facts_.clients.hiddenClients;
+    for (InterfaceView& view : views_) {
+        const Link& link = *view.link;
+        view.hidden = facts_.clients.processesHidden ||
+                      std::any_of(hidden.begin(), hidden.end(), [&](const ClientProcess& process) {
+                          return process.interfaces.empty() ? (link.flags & IFF_BROADCAST) != 0
+                                                            : process.serves(link.name);
+                      });
     }
 }
 
@@ -154,7 +263,8 @@ void Machine::collectSockets() {
     // it, and then no more than the process would, where that can be seen.
     const bool clientSeen =
         std::any_of(facts_.clients.processes.begin(), facts_.clients.processes.end(),
-                    [](const ClientProcess& process) { return !process.ipv6; });
+                    [](const ClientProcess& process) { return !process.ipv6; }) ||
+        facts_.clients.runs(Client::Dhcpcd);
     for (const PortSocket& socket : facts_.clients.sockets.bound) {
         if (socket.address) {
             for (const Holder& holder : holders(*socket.address)) {
@@ -168,6 +278,38 @@ void Machine::collectSockets() {
             }
         }
     }
+}
+
+void Machine::findNextChange() {
+    const auto consider = [this](std::optional<std::int64_t> time) {
+        if (time && *time > now_) {
+            changesAt_ = std::min(changesAt_, *time);
+        }
+    };
+    for (const InterfaceView& view : views_) {
+        for (const auto* leases : {&view.leases, &view.leases6}) {
+            for (const Lease* lease : *leases) {
+                consider(lease->expires);
+                consider(lease->rebinds);
+            }
+        }
+    }
+}
+
+std::int32_t Machine::processOf(Client manager) const {
+    const auto& managers = facts_.clients.managers;
+    const auto found =
+        std::find_if(managers.begin(), managers.end(), [&](const ManagerProcess& process) {
+            return process.client == manager && process.where != ManagerProcess::Where::Elsewhere;
+        });
+    return found == managers.end() ? 0 : found->pid;
+}
+
+const Link* Machine::linkOf(std::uint32_t ifindex) const {
+    const auto found = std::lower_bound(
+        facts_.links.begin(), facts_.links.end(), ifindex,
+        [](const Link& link, std::uint32_t wanted) { return link.ifindex < wanted; });
+    return found != facts_.links.end() && found->ifindex == ifindex ? &*found : nullptr;
 }
 
 InterfaceView* Machine::find(std::uint32_t ifindex) {
@@ -186,10 +328,28 @@ InterfaceView* Machine::find(const InterfaceName& name) {
     return found != byName_.end() && views_[*found].link->name == name ? &views_[*found] : nullptr;
 }
 
-InterfaceView* Machine::findByAddress(const Lease& lease, std::int64_t now) {
+InterfaceView* Machine::find(const LinkConfiguration& configuration) {
+    if (configuration.ifindex != 0) {
+        return find(configuration.ifindex);
+    }
+    return configuration.interfaceName ? find(*configuration.interfaceName) : nullptr;
+}
+
+InterfaceView* Machine::findLink(const Lease& lease) {
+    if (lease.ifindex != 0) {
+        InterfaceView* const view = find(lease.ifindex);
+        const bool namesTwo =
+            view != nullptr && lease.interfaceName && view->link->name != *lease.interfaceName;
+        return namesTwo ? nullptr : view;
+    }
+    InterfaceView* const view = lease.interfaceName ? find(*lease.interfaceName) : nullptr;
+    return view != nullptr && addressOf(lease, *view) != nullptr ? view : findByAddress(lease);
+}
+
+InterfaceView* Machine::findByAddress(const Lease& lease) {
     const auto found = holders(lease.address);
-    const bool meant =
-        found.size() == 1 && (!lease.interfaceName || endsWith(*found.front().address, lease, now));
+    const bool meant = found.size() == 1 &&
+                       (!lease.interfaceName || endsTogether(lease, *found.front().address, now_));
     return meant ? found.front().view : nullptr;
 }
 
@@ -211,7 +371,7 @@ void Machine::collectBootLease() {
         }
     }
     const bool spokenFor = holder == nullptr || !holder->leases.empty() ||
-                           holder->management != nullptr || holder->configuration != nullptr ||
+                           !holder->managements.empty() || !holder->configurations.empty() ||
                            !holder->processes.empty() || holder->socket != nullptr;
     if (spokenFor || only->validLifetime != Address::infinite) {
         return;

@@ -80,30 +80,35 @@ const Lease* leaseOf(const InterfaceView& view) {
     return nullptr;
 }
 
-/// A DHCPv4 client that runs on the link; null for none.
-const ClientProcess* process4(const InterfaceView& view) {
-    const auto found = std::find_if(view.processes.begin(), view.processes.end(),
-                                    [](const ClientProcess* process) { return !process->ipv6; });
-    return found == view.processes.end() ? nullptr : *found;
-}
-
-/// Whether a configuration asks for DHCP of either protocol; nullopt when it does not tell.
-std::optional<bool> wantsDhcp(const LinkConfiguration& configuration) {
+/// Whether a configuration has DHCP of either protocol; nullopt when it does not tell.
+std::optional<bool> hasDhcp(const LinkConfiguration& configuration) {
     if (configuration.dhcp4.value_or(false) || configuration.dhcp6.value_or(false)) {
         return true;
     }
     return configuration.dhcp4;
 }
 
-/// What says how the link is to be configured: its manager, or else the files of such.
-const LinkConfiguration* intent(const InterfaceView& view) {
-    return view.management != nullptr && view.management->dhcp4 ? view.management
-                                                                : view.configuration;
+const LinkConfiguration* naming(const std::vector<const LinkConfiguration*>& configurations,
+                                const Address* address) {
+    const auto found = std::find_if(
+        configurations.begin(), configurations.end(), [&](const LinkConfiguration* each) {
+            const auto& told = each->staticAddresses;
+            return address != nullptr &&
+                   std::find(told.begin(), told.end(), address->ip) != told.end();
+        });
+    return found == configurations.end() ? nullptr : *found;
 }
 
-bool names(const LinkConfiguration& configuration, const Address& address) {
-    const auto& told = configuration.staticAddresses;
-    return std::find(told.begin(), told.end(), address.ip) != told.end();
+/// Whether something that runs takes IPv4 addresses for the link by DHCP, or may do so unseen.
+bool mayTakeAddresses(const InterfaceView& view) {
+    return view.process(false) != nullptr || view.dhcpManagement(false) != nullptr ||
+           view.openSocket != nullptr || view.socket != nullptr || view.hidden;
+}
+
+/// Whether a client asks for an address, so that those of the link are not its own. udhcpc
+/// opens a socket for each request, and closes it when it has a lease.
+bool isAsking(const InterfaceView& view, const ClientProcess& process) {
+    return view.isHeardBy(process).value_or(false);
 }
 
 AddressSource sourceOf(const Lease& lease) {
@@ -179,34 +184,27 @@ constexpr std::array rows{
     DecisionRow{
         Properties::DHCPEnabled, "the master owns the addresses of its ports",
         [](const InterfaceView& view) { return view.enslaved ? Found{kernel(false)} : Found{}; }},
-    DecisionRow{Properties::DHCPEnabled, "the link's manager holds a lease",
+    DecisionRow{Properties::DHCPEnabled, "the link's manager uses DHCP",
                 [](const InterfaceView& view) -> Found {
-                    for (const auto* leases : {&view.leases, &view.leases6}) {
-                        for (const Lease* lease : *leases) {
-                            if (view.management != nullptr &&
-                                lease->client == view.management->client) {
-                                return from(*lease, true);
-                            }
+                    for (const bool ipv6 : {false, true}) {
+                        if (const auto* const management = view.dhcpManagement(ipv6)) {
+                            return from(*management, true);
                         }
                     }
                     return std::nullopt;
-                }},
-    DecisionRow{Properties::DHCPEnabled, "the configuration of the link's manager",
-                [](const InterfaceView& view) -> Found {
-                    const auto wanted =
-                        view.management == nullptr ? std::nullopt : wantsDhcp(*view.management);
-                    return wanted ? Found{from(*view.management, *wanted)} : Found{};
                 }},
     DecisionRow{Properties::DHCPEnabled, "a client runs on the link",
                 [](const InterfaceView& view) -> Found {
                     return view.processes.empty() ? Found{} : from(*view.processes.front(), true);
                 }},
-    DecisionRow{Properties::DHCPEnabled, "a client that runs holds a lease of the link",
+    DecisionRow{Properties::DHCPEnabled, "an address of the link is leased",
                 [](const InterfaceView& view) -> Found {
-                    // It may have been started under another name of the link.
-                    return !view.leases.empty() && view.leases.front()->clientAlive
-                               ? Found{from(*view.leases.front(), true)}
-                               : Found{};
+                    for (const auto* leases : {&view.leases, &view.leases6}) {
+                        if (!leases->empty()) {
+                            return from(*leases->front(), true);
+                        }
+                    }
+                    return std::nullopt;
                 }},
     DecisionRow{Properties::DHCPEnabled, "a socket listens on the link's DHCP client port",
                 [](const InterfaceView& view) {
@@ -214,19 +212,24 @@ constexpr std::array rows{
                                ? Found{fromSocket(true)}
                                : Found{};
                 }},
-    DecisionRow{Properties::DHCPEnabled, "the configuration that is kept for the link",
-                [](const InterfaceView& view) -> Found {
-                    const auto wanted = view.configuration == nullptr
-                                            ? std::nullopt
-                                            : wantsDhcp(*view.configuration);
-                    return wanted ? Found{from(*view.configuration, *wanted)} : Found{};
-                }},
-    DecisionRow{Properties::DHCPEnabled, "an IPv4 address with an end, as only DHCP clients set it",
+    DecisionRow{Properties::DHCPEnabled,
+                "an IPv4 address with an end, where this user may not see all clients",
                 [](const InterfaceView& view) {
-                    return firstIPv4(view, hasEnd) ? Found{kernel(true)} : Found{};
+                    return view.hidden && firstIPv4(view, hasEnd) ? Found{kernel(true)} : Found{};
                 }},
-    DecisionRow{Properties::DHCPEnabled, "nothing speaks for DHCP",
-                [](const InterfaceView& /*view*/) -> Found { return kernel(false); }},
+    DecisionRow{Properties::DHCPEnabled, "the link's manager does not use DHCP",
+                [](const InterfaceView& view) -> Found {
+                    for (const LinkConfiguration* management : view.managements) {
+                        if (!view.hidden && hasDhcp(*management)) {
+                            return from(*management, false);
+                        }
+                    }
+                    return std::nullopt;
+                }},
+    DecisionRow{Properties::DHCPEnabled, "no client has the link, and no address of it is leased",
+                [](const InterfaceView& view) -> Found {
+                    return view.hidden || firstIPv4(view, hasEnd) ? Found{} : kernel(false);
+                }},
 
     DecisionRow{Properties::AddressSource, "the master owns the addresses of its ports",
                 [](const InterfaceView& view) {
@@ -239,10 +242,8 @@ constexpr std::array rows{
                 }},
     DecisionRow{Properties::AddressSource, "the link's manager was told this very address",
                 [](const InterfaceView& view) -> Found {
-                    return view.management != nullptr && view.address != nullptr &&
-                                   names(*view.management, *view.address)
-                               ? Found{from(*view.management, source(AddressSource::Static))}
-                               : Found{};
+                    const auto* const told = naming(view.managements, view.address);
+                    return told == nullptr ? Found{} : from(*told, source(AddressSource::Static));
                 }},
     DecisionRow{Properties::AddressSource, "169.254/16 with link scope (RFC 3927)",
                 [](const InterfaceView& view) {
@@ -252,10 +253,12 @@ constexpr std::array rows{
                 }},
     DecisionRow{Properties::AddressSource, "the link's manager uses the address for others",
                 [](const InterfaceView& view) -> Found {
-                    return view.management != nullptr && view.address != nullptr &&
-                                   view.management->other4
-                               ? Found{from(*view.management, source(AddressSource::Other))}
-                               : Found{};
+                    for (const LinkConfiguration* management : view.managements) {
+                        if (view.address != nullptr && management->other4) {
+                            return from(*management, source(AddressSource::Other));
+                        }
+                    }
+                    return std::nullopt;
                 }},
     DecisionRow{Properties::AddressSource, "a DHCP client listens at this very address",
                 [](const InterfaceView& view) {
@@ -265,59 +268,43 @@ constexpr std::array rows{
                                : Found{};
                 }},
     DecisionRow{Properties::AddressSource,
-                "an IPv4 address with an end, as only DHCP clients set it",
+                "an IPv4 address with an end, where a DHCP client may have set it",
                 [](const InterfaceView& view) {
-                    return view.address != nullptr && hasEnd(*view.address)
+                    return view.address != nullptr && hasEnd(*view.address) &&
+                                   mayTakeAddresses(view)
                                ? Found{kernel(source(AddressSource::DHCP))}
                                : Found{};
                 }},
-    DecisionRow{Properties::AddressSource,
-                "set once at the start of the system, and left as it is since",
+    DecisionRow{Properties::AddressSource, "a lease that has ended names this very address",
                 [](const InterfaceView& view) -> Found {
-                    return view.address != nullptr && view.formerLease != nullptr &&
-                                   view.formerLease->address == view.address->ip
-                               ? Found{from(*view.formerLease, source(sourceOf(*view.formerLease)))}
-                               : Found{};
-                }},
-    DecisionRow{Properties::AddressSource, "udhcpc runs, which sets addresses without an end",
-                [](const InterfaceView& view) -> Found {
-                    const ClientProcess* const process = process4(view);
-                    return view.address != nullptr && isPermanent(*view.address) &&
-                                   process != nullptr && process->client == Client::Udhcpc
-                               ? Found{from(*process, source(AddressSource::DHCP))}
-                               : Found{};
+                    for (const Lease* lease : view.ended) {
+                        if (view.address != nullptr && lease->address == view.address->ip) {
+                            // A client that asks anew is not bound by what it had.
+                            return from(*lease,
+                                        source(mayTakeAddresses(view) ? AddressSource::Unknown
+                                                                      : sourceOf(*lease)));
+                        }
+                    }
+                    return std::nullopt;
                 }},
     DecisionRow{Properties::AddressSource, "the configuration names this very address",
                 [](const InterfaceView& view) -> Found {
-                    return view.configuration != nullptr && view.address != nullptr &&
-                                   names(*view.configuration, *view.address)
-                               ? Found{from(*view.configuration, source(AddressSource::Static))}
-                               : Found{};
+                    const auto* const told = naming(view.configurations, view.address);
+                    return told == nullptr ? Found{} : from(*told, source(AddressSource::Static));
                 }},
-    DecisionRow{Properties::AddressSource,
-                "the configuration that is kept for the link, which no manager has",
+    DecisionRow{Properties::AddressSource, "udhcpc runs, which sets addresses without an end",
                 [](const InterfaceView& view) -> Found {
-                    if (view.configuration == nullptr || view.management != nullptr ||
-                        view.address == nullptr) {
-                        return std::nullopt;
-                    }
-                    const LinkConfiguration& configuration = *view.configuration;
-                    if (configuration.dhcp4.value_or(false)) {
-                        return from(configuration, source(AddressSource::DHCP));
-                    }
-                    if (configuration.bootp4) {
-                        return from(configuration, source(AddressSource::BOOTP));
-                    }
-                    return configuration.other4
-                               ? Found{from(configuration, source(AddressSource::Other))}
+                    const ClientProcess* const process = view.process(false);
+                    return view.address != nullptr && isPermanent(*view.address) &&
+                                   process != nullptr && process->client == Client::Udhcpc &&
+                                   !isAsking(view, *process)
+                               ? Found{from(*process, source(AddressSource::DHCP))}
                                : Found{};
                 }},
     DecisionRow{Properties::AddressSource, "permanent, and no DHCPv4 client that could have set it",
                 [](const InterfaceView& view) {
-                    const bool managerWantsDhcp =
-                        view.management != nullptr && view.management->dhcp4.value_or(false);
                     return view.address != nullptr && isPermanent(*view.address) &&
-                                   process4(view) == nullptr && !managerWantsDhcp
+                                   !mayTakeAddresses(view)
                                ? Found{kernel(source(AddressSource::Static))}
                                : Found{};
                 }},
@@ -326,34 +313,13 @@ constexpr std::array rows{
                     return view.address != nullptr ? Found{kernel(source(AddressSource::Unknown))}
                                                    : Found{};
                 }},
-    DecisionRow{Properties::AddressSource, "no address yet: a DHCP client is to give one",
+    DecisionRow{Properties::AddressSource, "a live DHCPv6 lease, and no IPv4 address",
                 [](const InterfaceView& view) -> Found {
-                    const ClientProcess* const process = process4(view);
-                    return process != nullptr ? Found{from(*process, source(AddressSource::DHCP))}
-                                              : Found{};
+                    return view.leases6.empty()
+                               ? Found{}
+                               : from(*view.leases6.front(), source(AddressSource::DHCP));
                 }},
-    DecisionRow{Properties::AddressSource, "no address yet: what is meant to give one",
-                [](const InterfaceView& view) -> Found {
-                    const LinkConfiguration* const meant = intent(view);
-                    if (meant == nullptr) {
-                        return std::nullopt;
-                    }
-                    if (meant->dhcp4.value_or(false)) {
-                        return from(*meant, source(AddressSource::DHCP));
-                    }
-                    if (meant->bootp4) {
-                        return from(*meant, source(AddressSource::BOOTP));
-                    }
-                    if (!meant->staticAddresses.empty()) {
-                        return from(*meant, source(AddressSource::Static));
-                    }
-                    if (meant->linkLocal4) {
-                        return from(*meant, source(AddressSource::LinkLocal));
-                    }
-                    return meant->other4 ? Found{from(*meant, source(AddressSource::Other))}
-                                         : Found{};
-                }},
-    DecisionRow{Properties::AddressSource, "no address, and nothing that is meant to give one",
+    DecisionRow{Properties::AddressSource, "no address",
                 [](const InterfaceView& /*view*/) -> Found {
                     return kernel(source(AddressSource::Unknown));
                 }},

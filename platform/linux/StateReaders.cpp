@@ -1,6 +1,9 @@
 #include "StateReaders.h"
 
+#include <sys/types.h>
+
 #include <array>
+#include <vector>
 
 #include "clients/Connman.h"
 #include "clients/Dhclient.h"
@@ -51,10 +54,6 @@ constexpr std::array ifupdownPlaces{StatePlace{ifupdownDirectory, ifupdownFile},
 constexpr std::array ifcfgPlaces{StatePlace{ifcfgDirectories[0], ifcfgPrefix},
                                  StatePlace{ifcfgDirectories[1], ifcfgPrefix}};
 
-void addSockets(const Roots& roots, ClientFacts& facts) {
-    facts.sockets = readSockets(roots, facts.diagnostics);
-}
-
 // Managers before the clients that they may start, and those before what is left of
 // the boot. The files of /proc cannot be watched.
 constexpr std::array readers{
@@ -71,10 +70,23 @@ constexpr std::array readers{
     StateReader{readNetplan, netplanPlaces},
     StateReader{readIfupdown, ifupdownPlaces},
     StateReader{readIfcfg, ifcfgPlaces},
-    StateReader{addSockets, {}},
+    StateReader{readClientSockets, {}},
 };
 
 }  // namespace
+
+void readClientSockets(const Roots& roots, ClientFacts& facts) {
+    std::vector<uid_t> users;
+    for (const ClientProcess& process : facts.processes) {
+        users.push_back(process.user);
+    }
+    for (const ManagerProcess& manager : facts.managers) {
+        if (manager.where != ManagerProcess::Where::Elsewhere) {
+            users.push_back(manager.user);
+        }
+    }
+    facts.sockets = readSockets(roots, facts.diagnostics, users);
+}
 
 std::span<const StateReader> stateReaders() noexcept {
     return readers;

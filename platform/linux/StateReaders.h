@@ -25,4 +25,7 @@ struct StateReader {
 /// programs run.
 [[nodiscard]] std::span<const StateReader> stateReaders() noexcept;
 
+/// Reads the sockets of clients, of which nothing notifies. The processes come before.
+void readClientSockets(const Roots& roots, ClientFacts& facts);
+
 }  // namespace ZR::Live

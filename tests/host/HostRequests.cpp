@@ -3,6 +3,7 @@
 #include <algorithm>
 
 #include "cimom/ObjectPathText.h"
+#include "cimom/Results.h"
 
 namespace strict {
 

@@ -12,6 +12,7 @@
 
 #include "HostRequests.h"
 #include "cimom/ObjectPathText.h"
+#include "cimom/Results.h"
 #include "kit/StrictHost.h"
 #include "kit/TemporaryDirectory.h"
 #include "kit/Tree.h"

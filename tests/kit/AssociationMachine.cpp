@@ -1,5 +1,6 @@
 #include "kit/AssociationMachine.h"
 
+#include "cimom/Instance.h"
 #include "cimom/ObjectPathText.h"
 
 namespace test {

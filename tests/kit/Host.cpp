@@ -1,5 +1,8 @@
 #include "kit/Host.h"
 
+#include "broker/objects/BrokerInstance.h"
+#include "cimom/Instance.h"
+
 namespace test {
 
 namespace {

@@ -12,9 +12,12 @@
 #include "broker/Conversion.h"
 #include "broker/RequestScope.h"
 #include "broker/objects/BrokerContext.h"
+#include "broker/objects/BrokerObjectPath.h"
 #include "broker/objects/BrokerResult.h"
 #include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
 #include "cimom/ObjectManager.h"
+#include "cimom/Results.h"
 #include "kit/CountedBroker.h"
 
 namespace test {

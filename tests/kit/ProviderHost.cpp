@@ -13,7 +13,9 @@
 
 #include "broker/Conversion.h"
 #include "broker/RequestScope.h"
+#include "broker/objects/BrokerInstance.h"
 #include "cimom/ObjectPathText.h"
+#include "cimom/Results.h"
 #include "manager/ProviderCall.h"
 
 namespace test {

@@ -4,6 +4,8 @@
 #include <memory>
 
 #include "broker/BrokerTypes.h"
+#include "cimom/ClassDeclaration.h"
+#include "cimom/Instance.h"
 #include "cimom/Names.h"
 #include "cimom/ObjectPathText.h"
 #include "kit/StrictObjects.h"

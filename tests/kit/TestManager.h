@@ -9,8 +9,10 @@
 #include <string>
 #include <vector>
 
+#include "cimom/Instance.h"
 #include "cimom/ObjectManager.h"
 #include "cimom/ObjectPathText.h"
+#include "cimom/Results.h"
 
 namespace cimom::test {
 

@@ -8,6 +8,7 @@
 
 #include "cimom/ObjectManager.h"
 #include "cimom/ObjectPathText.h"
+#include "cimom/Results.h"
 #include "kit/ChildProcess.h"
 #include "kit/PrivateNamespace.h"
 #include "kit/Tree.h"

@@ -10,7 +10,9 @@
 #include <map>
 
 #include "ShippedSchema.h"
+#include "cimom/ClassDeclaration.h"
 #include "cimom/Instance.h"
+#include "cimom/MofError.h"
 
 namespace cimom {
 namespace {

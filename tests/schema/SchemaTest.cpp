@@ -5,7 +5,9 @@
 #include <set>
 
 #include "ShippedSchema.h"
+#include "cimom/ClassDeclaration.h"
 #include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
 
 namespace cimom {
 namespace {

@@ -4,6 +4,8 @@
 #include <set>
 
 #include "ShippedSchema.h"
+#include "cimom/ClassDeclaration.h"
+#include "cimom/Instance.h"
 
 namespace cimom {
 namespace {

@@ -7,7 +7,9 @@
 #include <string_view>
 #include <vector>
 
+#include "cimom/ClassDeclaration.h"
 #include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
 
 /// The schema that is shipped, read as the object manager reads it.
 namespace cimom::shipped {

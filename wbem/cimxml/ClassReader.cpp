@@ -5,6 +5,7 @@
 #include <system_error>
 #include <utility>
 
+#include "cimom/ClassDeclaration.h"
 #include "cimom/Names.h"
 #include "cimxml/Errors.h"
 #include "cimxml/ObjectReader.h"

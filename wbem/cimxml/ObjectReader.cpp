@@ -5,6 +5,7 @@
 #include <optional>
 #include <utility>
 
+#include "cimom/Instance.h"
 #include "cimxml/Errors.h"
 #include "cimxml/ScalarText.h"
 

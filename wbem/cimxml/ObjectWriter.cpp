@@ -3,6 +3,8 @@
 #include <algorithm>
 #include <memory>
 
+#include "cimom/ClassDeclaration.h"
+#include "cimom/Instance.h"
 #include "cimom/Names.h"
 #include "cimom/ObjectPathText.h"
 #include "cimxml/ScalarText.h"

@@ -3,6 +3,7 @@
 #include <utility>
 
 #include "MessageHead.h"
+#include "cimom/Instance.h"
 #include "cimom/Names.h"
 #include "cimxml/ObjectWriter.h"
 #include "cimxml/XmlText.h"

@@ -4,6 +4,7 @@
 #include <system_error>
 #include <utility>
 
+#include "cimom/Instance.h"
 #include "cimom/Names.h"
 #include "cimxml/Errors.h"
 #include "cimxml/ObjectReader.h"

@@ -5,6 +5,8 @@
 #include <variant>
 #include <vector>
 
+#include "cimom/Instance.h"
+
 namespace cimom::wbem {
 
 namespace {

@@ -2,6 +2,7 @@
 
 #include "broker/BrokerTypes.h"
 #include "broker/objects/BrokerStatus.h"
+#include "cimom/ClassDeclaration.h"
 #include "cimom/ClassRepository.h"
 #include "cimom/Names.h"
 #include "model/NameKey.h"
@@ -9,6 +10,27 @@
 namespace cimom::broker {
 
 namespace {
+
+/// Whether a value of the CMPI type can be the property's. An embedded instance
+/// fits a text property that is declared to hold one.
+bool fits(const PropertyDeclaration& property, CMPIType type) noexcept {
+    if (type == CMPI_null) {
+        return true;
+    }
+    if (isArrayType(type) != property.isArray) {
+        return false;
+    }
+    const auto given = cimType(withoutArray(type));
+    if (!given) {
+        return false;
+    }
+    if (*given == property.type) {
+        return true;
+    }
+    return *given == Type::instance && property.type == Type::string &&
+           (property.qualifier("EmbeddedInstance") != nullptr ||
+            property.qualifier("EmbeddedObject") != nullptr);
+}
 
 CMPIStatus release(CMPIInstance* self) {
     InstanceRecord* const instance = instanceOf(self);

@@ -7,10 +7,7 @@
 #include "broker/Arena.h"
 #include "broker/objects/BrokerObjectPath.h"
 #include "broker/objects/BrokerValues.h"
-
-namespace cimom {
-struct ClassDeclaration;
-}
+#include "cimom/Forward.h"
 
 namespace cimom::broker {
 

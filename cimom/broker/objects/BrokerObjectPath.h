@@ -5,10 +5,7 @@
 #include "broker/Arena.h"
 #include "broker/objects/BrokerString.h"
 #include "broker/objects/BrokerValues.h"
-
-namespace cimom {
-class ClassRepository;
-}
+#include "cimom/Forward.h"
 
 namespace cimom::broker {
 

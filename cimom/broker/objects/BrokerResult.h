@@ -8,10 +8,8 @@
 #include <string>
 #include <variant>
 
-#include "cimom/Instance.h"
-#include "cimom/ObjectPath.h"
+#include "cimom/Forward.h"
 #include "cimom/ResultReceiver.h"
-#include "cimom/Status.h"
 
 namespace cimom::broker {
 

@@ -6,8 +6,7 @@
 #include <string_view>
 #include <vector>
 
-#include "cimom/ClassDeclaration.h"
-#include "cimom/MofError.h"
+#include "cimom/Forward.h"
 
 namespace cimom {
 

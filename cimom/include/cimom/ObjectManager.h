@@ -5,7 +5,7 @@
 #include <string>
 #include <vector>
 
-#include "cimom/ClassRepository.h"
+#include "cimom/Forward.h"
 #include "cimom/Registrations.h"
 #include "cimom/Requests.h"
 

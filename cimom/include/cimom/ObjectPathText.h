@@ -6,6 +6,7 @@
 #include <string_view>
 
 #include "cimom/ObjectPath.h"
+#include "cimom/Value.h"
 
 namespace cimom {
 

@@ -4,8 +4,7 @@
 #include <string>
 #include <vector>
 
-#include "cimom/Instance.h"
-#include "cimom/ObjectPath.h"
+#include "cimom/Forward.h"
 #include "cimom/ResultReceiver.h"
 #include "cimom/Status.h"
 
@@ -24,19 +23,6 @@ struct AssociationRequest {
     std::optional<std::string> resultRole;  ///< of associators
     std::optional<std::vector<std::string>> propertyList;
     std::string principal;
-};
-
-/// The whole result of a request. Entries that the provider handed over as null are
-/// absent; they are kept so that a command line can show them.
-struct PathsResult {
-    Status status;
-    std::vector<std::optional<ObjectPath>> paths;
-    unsigned returnDoneCalls = 0;
-};
-struct InstancesResult {
-    Status status;
-    std::vector<std::optional<Instance>> instances;
-    unsigned returnDoneCalls = 0;
 };
 
 /// How a request ended whose objects went to a receiver.

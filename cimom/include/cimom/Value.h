@@ -2,43 +2,17 @@
 
 #include <cstdint>
 #include <memory>
-#include <optional>
 #include <string>
 #include <string_view>
 #include <variant>
 #include <vector>
 
+#include "cimom/Forward.h"
+#include "cimom/Type.h"
+
 /// The object manager's own model of CIM data: plain values without any tie to
 /// CMPI records, to MOF or to XML, which are translated from and to it.
 namespace cimom {
-
-/// CIM data types (DSP0004, 5.2).
-enum class Type : std::uint8_t {
-    boolean,
-    char16,
-    uint8,
-    uint16,
-    uint32,
-    uint64,
-    sint8,
-    sint16,
-    sint32,
-    sint64,
-    real32,
-    real64,
-    string,
-    datetime,
-    reference,
-    instance,
-};
-
-/// The name of a type as MOF and CIM-XML write it, e.g. "uint16"; "reference"
-/// and "instance" for those two.
-[[nodiscard]] std::string_view typeName(Type type) noexcept;
-[[nodiscard]] std::optional<Type> typeFromName(std::string_view name) noexcept;
-
-struct ObjectPath;
-struct Instance;
 
 /// One element: std::monostate is null. All integers are held in 64 bits of
 /// their signedness, reals in a double, datetimes as their 25-character text.

@@ -3,16 +3,16 @@
 #include <sys/stat.h>
 
 #include <algorithm>
-#include <cerrno>
 #include <cstddef>
-#include <tuple>
+#include <ctime>
 #include <utility>
 #include <vector>
 
 #include "clients/DhclientLease.h"
+#include "clients/ProcessFiles.h"
 #include "formats/Files.h"
 #include "formats/InterfaceName.h"
-#include "formats/SystemErrors.h"
+#include "formats/Trust.h"
 
 namespace ZR::Live {
 namespace {
@@ -49,7 +49,8 @@ struct LeaseFileId {
 };
 
 struct LeaseFile {
-    std::string path;
+    std::string path;   // as it was named
+    std::string place;  // without symbolic links
     LeaseFileId id;
     std::pair<std::int64_t, std::int64_t> modified;  // seconds, nanoseconds
     std::vector<const ClientProcess*> keepers;       // clients that keep it now
@@ -64,21 +65,34 @@ class LeaseFiles {
   public:
     explicit LeaseFiles(ClientFacts& facts) : facts_(facts) {}
 
-    void add(const std::string& path, const ClientProcess* keeper) {
-        struct stat status {};
-        if (::stat(path.c_str(), &status) != 0) {
-            if (!isAbsent(errno)) {
-                facts_.diagnostics.push_back(unreadable(path, errno));
-            }
+    /// `root` is the directory for which "/" stands, where that is another than this
+    /// process's own.
+    void add(const std::string& path, const ClientProcess* keeper, std::string_view root = {}) {
+        std::vector<uid_t> writers;
+        if (keeper != nullptr) {
+            writers.push_back(keeper->user);
+        }
+        auto found = findFile(path, writers, facts_.diagnostics, root);
+        if (!found) {
             return;
         }
-        const LeaseFileId id{.device = status.st_dev, .inode = status.st_ino};
+        const LeaseFileId id{.device = found->status.st_dev, .inode = found->status.st_ino};
         auto file = std::find_if(files_.begin(), files_.end(),
                                  [&](const LeaseFile& known) { return known.id == id; });
         if (file == files_.end()) {
-            files_.push_back({.path = path,
+            std::string named = std::string{root} + path;
+            if (!found->doubt.empty()) {
+                facts_.diagnostics.push_back(untrusted(named, found->doubt));
+                return;
+            }
+            if (found->path != named) {
+                watch(found->path);
+            }
+            const timespec& written = found->status.st_mtim;
+            files_.push_back({.path = std::move(named),
+                              .place = std::move(found->path),
                               .id = id,
-                              .modified = {status.st_mtim.tv_sec, status.st_mtim.tv_nsec},
+                              .modified = {written.tv_sec, written.tv_nsec},
                               .keepers = {}});
             file = files_.end() - 1;
         }
@@ -95,6 +109,13 @@ class LeaseFiles {
         }
     }
 
+    /// Has changes of one file noticed, also that it comes.
+    void watch(const std::string& path) {
+        const std::size_t slash = path.rfind('/');
+        facts_.places.push_back({.directory = path.substr(0, std::max<std::size_t>(slash, 1)),
+                                 .namePrefix = path.substr(slash + 1)});
+    }
+
     [[nodiscard]] std::vector<LeaseFile> newestFirst() && {
         std::stable_sort(files_.begin(), files_.end(), [](const LeaseFile& a, const LeaseFile& b) {
             return a.modified > b.modified;
@@ -108,55 +129,77 @@ class LeaseFiles {
 };
 
 void addProcessFile(const Roots& roots, const ClientProcess& process, LeaseFiles& files,
-                    std::vector<WatchedPlace>& places) {
-    if (process.leaseFile.empty()) {
-        for (const DhclientDirectory& directory : dhclientDirectories) {
-            if (directory.isDefault) {
-                files.add(roots.path(directory.path) +
-                              (process.ipv6 ? "/dhclient6.leases" : "/dhclient.leases"),
-                          &process);
-            }
+                    std::vector<Diagnostic>& diagnostics) {
+    if (!process.leaseFile.empty()) {
+        if (const auto file = fileOfProcess(roots, process, process.leaseFile, diagnostics)) {
+            files.watch(file->root + file->path);
+            files.add(file->path, &process, file->root);
         }
         return;
     }
-    // A relative name depends on the directory in which the client was started, which is
-    // not known.
-    if (process.leaseFile.front() != '/') {
-        return;
+    for (const DhclientDirectory& directory : dhclientDirectories) {
+        if (directory.isDefault) {
+            const std::string path = std::string{directory.path} +
+                                     (process.ipv6 ? "/dhclient6.leases" : "/dhclient.leases");
+            if (const auto file = fileOfProcess(roots, process, path, diagnostics)) {
+                files.add(file->path, &process, file->root);
+            }
+        }
     }
-    const std::string path = roots.path(process.leaseFile);
-    const std::size_t slash = path.rfind('/');
-    places.push_back({.directory = path.substr(0, std::max<std::size_t>(slash, 1)),
-                      .namePrefix = path.substr(slash + 1)});
-    files.add(path, &process);
 }
 
-bool keeps(const LeaseFile& file, const DhclientLease& lease) {
-    return std::any_of(file.keepers.begin(), file.keepers.end(), [&](const ClientProcess* keeper) {
-        return keeper->ipv6 == lease.ipv6 && keeper->serves(lease.interfaceName);
-    });
+/// The running client that keeps a lease in a file; nullptr without one.
+const ClientProcess* keeperOf(const LeaseFile& file, const DhclientLease& lease) {
+    const auto keeper =
+        std::find_if(file.keepers.begin(), file.keepers.end(), [&](const ClientProcess* candidate) {
+            return candidate->ipv6 == lease.ipv6 && candidate->serves(lease.interfaceName);
+        });
+    return keeper == file.keepers.end() ? nullptr : *keeper;
+}
+
+/// nullopt for a file that cannot be read.
+std::optional<DhclientLeases> readLeases(const LeaseFile& file,
+                                         std::vector<Diagnostic>& diagnostics) {
+    // The client appends to its file: a reading may find a half of the last block. The other
+    // half follows at once.
+    std::optional<DhclientLeases> found;
+    for (int attempt = 0; attempt < 2 && (!found || found->cutOff); ++attempt) {
+        const auto content = readOptionalFile(file.place, diagnostics);
+        if (!content) {
+            return std::nullopt;
+        }
+        found = parseDhclientLeases(*content);
+    }
+    return found;
 }
 
 void addLeases(const LeaseFile& file, ClientFacts& facts) {
-    const auto content = readOptionalFile(file.path, facts.diagnostics);
-    if (!content) {
+    const auto found = readLeases(file, facts.diagnostics);
+    if (!found) {
         return;
     }
-    // A file that ends within a block is being written: the rest shows as a change.
-    for (const DhclientLease& lease : parseDhclientLeases(*content)) {
-        const bool alive = keeps(file, lease);
+    for (const DhclientDamage& damage : found->damage) {
+        facts.diagnostics.emplace_back(
+            file.path + ", line " + std::to_string(damage.line) + ": " + damage.what,
+            Diagnostic::Kind::Damaged);
+    }
+    for (const DhclientLease& lease : found->leases) {
+        const ClientProcess* const keeper = keeperOf(file, lease);
         for (const DhclientAddress& address : lease.addresses) {
-            if (!address.expires) {
-                continue;  // a claim without an end cannot be told from a stale one
-            }
             facts.leases.push_back({.client = Client::Dhclient,
                                     .interfaceName = lease.interfaceName,
                                     .address = address.address,
                                     .server = lease.server,
                                     .bootp = lease.bootp,
                                     .released = lease.released,
-                                    .clientAlive = alive,
+                                    .clientAlive = keeper != nullptr,
                                     .expires = address.expires,
+                                    .obtained = address.obtained,
+                                    .renews = address.renews,
+                                    .rebinds = address.rebinds,
+                                    .options = lease.options,
+                                    .clientIdentifier = lease.clientIdentifier,
+                                    .pid = keeper == nullptr ? 0 : keeper->pid,
                                     .origin = file.path});
         }
     }
@@ -195,7 +238,7 @@ void readDhclient(const Roots& roots, ClientFacts& facts) {
     LeaseFiles files{facts};
     for (const ClientProcess& process : facts.processes) {
         if (process.client == Client::Dhclient) {
-            addProcessFile(roots, process, files, facts.places);
+            addProcessFile(roots, process, files, facts.diagnostics);
         }
     }
     for (const DhclientDirectory& directory : dhclientDirectories) {

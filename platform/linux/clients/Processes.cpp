@@ -1,6 +1,10 @@
 #include "clients/Processes.h"
 
 #include <fcntl.h>
+#include <linux/capability.h>
+#include <linux/magic.h>
+#include <sys/stat.h>
+#include <sys/vfs.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -12,20 +16,26 @@
 #include <span>
 #include <string>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 #include "clients/Dhclient.h"
 #include "clients/Dhcp6c.h"
 #include "clients/Dhcpcd.h"
+#include "clients/ProcessStatus.h"
 #include "clients/Udhcpc.h"
 #include "formats/Directory.h"
 #include "formats/Files.h"
 #include "formats/Numbers.h"
 #include "formats/SystemErrors.h"
+#include "formats/Trust.h"
+#include "kernel/Sockets.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace ZR::Live {
 namespace {
+
+constexpr std::string_view dhcpcdName = "dhcpcd";
 
 /// Which process name is which client, and who understands its command line.
 struct KnownClient {
@@ -34,7 +44,7 @@ struct KnownClient {
 };
 constexpr std::array<KnownClient, 6> knownClients{{
     {"dhclient", parseDhclientArguments},
-    {"dhcpcd", parseDhcpcdArguments},
+    {dhcpcdName, parseDhcpcdArguments},
     {"udhcpc", parseUdhcpcArguments},
     {"udhcpc6", parseUdhcpcArguments},
     {"busybox", parseUdhcpcArguments},
@@ -85,9 +95,10 @@ std::string_view readShort(int proc, const char* path, std::span<char> buffer) {
                     : std::string_view{buffer.data(), static_cast<std::size_t>(got)};
 }
 
-/// Empty when it cannot be read, for the reason that errno then has.
-std::string readNamespace(int proc, const char* path) {
-    std::array<char, 64> target{};
+/// What a symbolic link says. Empty when it cannot be read, for the reason that errno then
+/// has.
+std::string readLink(int proc, const char* path) {
+    std::array<char, 256> target{};
     errno = 0;
     const ssize_t length = ::readlinkat(proc, path, target.data(), target.size());
     return length <= 0 ? std::string{}
@@ -106,7 +117,7 @@ std::vector<std::string_view> splitArguments(std::string_view commandLine) {
 
 /// Where a process runs, seen from this network namespace.
 ManagerProcess::Where whereIs(int proc, std::string_view process, const std::string& ownNamespace) {
-    const std::string other = readNamespace(proc, ProcessPath{process, "/ns/net"}.get());
+    const std::string other = readLink(proc, ProcessPath{process, "/ns/net"}.get());
     if (other.empty() || ownNamespace.empty()) {
         return ManagerProcess::Where::Unknown;
     }
@@ -166,28 +177,282 @@ std::vector<std::int32_t> kernelThreads(int proc) {
     return threads;
 }
 
-void readClient(int proc, std::string_view process, const KnownClient& client,
-                const std::string& ownNamespace, ClientFacts& facts) {
-    std::array<char, 4096> buffer{};
-    // A process that has ended but was not waited for keeps its name and has no
-    // arguments; it parses to nothing.
-    const auto arguments =
-        splitArguments(readShort(proc, ProcessPath{process, "/cmdline"}.get(), buffer));
-    auto found = client.parse(arguments);
-    if (!found) {
-        return;
-    }
-    const auto where = whereIs(proc, process, ownNamespace);
-    if (where == ManagerProcess::Where::Unknown && (errno == EACCES || errno == EPERM)) {
-        facts.diagnostics.push_back("cannot tell the links of process " + std::string{process} +
-                                    " (" + std::string{nameOf(found->client)} +
-                                    "): " + reasonOf(errno));
-    }
-    if (where == ManagerProcess::Where::Here) {
-        found->pid = numberOf(process);
-        facts.processes.push_back(*std::move(found));
-    }
+std::optional<ProcessStatus> readStatus(int proc, std::string_view process) {
+    // Much of it may be the list of its groups.
+    std::array<char, 16384> buffer{};
+    return parseProcessStatus(readShort(proc, ProcessPath{process, "/status"}.get(), buffer));
 }
+
+/// Whether a process is in the user namespace of this one. Only there do its capabilities
+/// say what it may do to this network namespace: any user has all of them in a user
+/// namespace of their own.
+bool sharesUserNamespace(int proc, std::string_view process) {
+    const std::string own = readLink(proc, "thread-self/ns/user");
+    const std::string other = readLink(proc, ProcessPath{process, "/ns/user"}.get());
+    if (!own.empty() && !other.empty()) {
+        return own == other;
+    }
+    // Any user may read which users of the parent namespace those of a namespace are. No two
+    // namespaces that this process can see have the same, unless root made them so.
+    std::array<char, 4096> ownBuffer{};
+    std::array<char, 4096> otherBuffer{};
+    const std::string_view ownUsers = readShort(proc, "thread-self/uid_map", ownBuffer);
+    return !ownUsers.empty() &&
+           ownUsers == readShort(proc, ProcessPath{process, "/uid_map"}.get(), otherBuffer);
+}
+
+/// Whether its program could be the one of that name. Any user can give the name and the
+/// arguments of a client to another program, which may be one that has privileges of its own.
+bool hasTheProgram(int proc, std::string_view process, std::string_view name) {
+    constexpr std::string_view manyPrograms = "busybox";
+    const std::string program = readLink(proc, ProcessPath{process, "/exe"}.get());
+    const std::string_view file = std::string_view{program}.substr(program.rfind('/') + 1);
+    return program.empty() || file.starts_with(name) || file.starts_with(manyPrograms);
+}
+
+/// Why a process cannot be a DHCP client of this network namespace: it may not open the
+/// sockets of one, or anyone could have started it. Empty when it can be one.
+std::string doubtOf(int proc, std::string_view process, std::string_view name,
+                    const ProcessStatus& status) {
+    constexpr std::uint64_t needed = (std::uint64_t{1} << CAP_NET_RAW) |
+                                     (std::uint64_t{1} << CAP_NET_BIND_SERVICE) |
+                                     (std::uint64_t{1} << CAP_NET_ADMIN);
+    struct stat program {};
+    const bool known = ::fstatat(proc, ProcessPath{process, "/exe"}.get(), &program, 0) == 0;
+    const bool lent = known && (program.st_mode & S_ISUID) != 0;
+    if (lent || (status.user == 0 && status.realUser != 0)) {
+        return "every user may start its program, which is set-user-ID";
+    }
+    if (status.user == 0) {
+        return {};
+    }
+    if ((status.capabilities & needed) == 0 || !sharesUserNamespace(proc, process)) {
+        return "user " + std::to_string(status.user) + " may not open the sockets of a DHCP client";
+    }
+    return hasTheProgram(proc, process, name) ? std::string{} : "its program has another name";
+}
+
+Diagnostic implausible(std::string_view process, std::string_view name, std::string_view doubt) {
+    return untrusted("process " + std::string{process} + " (" + std::string{name} + ")", doubt);
+}
+
+/// Reads all processes of a directory like /proc.
+class Reader {
+  public:
+    Reader(const Roots& roots, Directory& directory, ClientFacts& facts)
+        : roots_(roots),
+          directory_(directory),
+          proc_(directory.descriptor()),
+          // Of this thread: namespaces belong to threads, not to processes.
+          ownNamespace_(readLink(proc_, "thread-self/ns/net")),
+          facts_(facts) {}
+
+    void readAll() {
+        const std::vector<std::int32_t> ofKernel = kernelThreads(proc_);
+        for (std::string_view process = directory_.next(); !process.empty();
+             process = directory_.next()) {
+            if (process.front() >= '1' && process.front() <= '9' &&
+                !std::binary_search(ofKernel.begin(), ofKernel.end(), numberOf(process))) {
+                readProcess(process);
+            }
+        }
+        if (errno != 0) {
+            facts_.diagnostics.push_back(unreadable(roots_.proc, errno));
+        }
+        for (Candidate& candidate : candidates_) {
+            judge(candidate);
+        }
+        findHiding();
+    }
+
+  private:
+    struct Candidate {
+        std::string number;
+        std::string_view name;
+        ClientProcess process;
+        ProcessStatus status;
+        std::string doubt;
+    };
+    /// A process of dhcpcd, which is one program in several processes: what it heard and may
+    /// do is spread over them.
+    struct Part {
+        std::int32_t pid = 0;
+        std::int32_t parent = 0;
+        bool ofRoot = false;
+        bool hearsOthers = false;  // watches the addresses of others by ARP
+    };
+
+    void readProcess(std::string_view process) {
+        std::array<char, 32> buffer{};
+        std::string_view name = readShort(proc_, ProcessPath{process, "/comm"}.get(), buffer);
+        name = name.substr(0, name.find('\n'));
+        const auto* const client =
+            std::find_if(knownClients.begin(), knownClients.end(),
+                         [&](const KnownClient& known) { return known.name == name; });
+        if (client != knownClients.end()) {
+            readClient(process, *client);
+            return;
+        }
+        const auto* const manager =
+            std::find_if(knownManagers.begin(), knownManagers.end(),
+                         [&](const KnownManager& known) { return known.name == name; });
+        if (manager != knownManagers.end()) {
+            readManager(process, *manager);
+        }
+    }
+
+    void readClient(std::string_view process, const KnownClient& client) {
+        std::array<char, 32768> buffer{};
+        const auto arguments =
+            splitArguments(readShort(proc_, ProcessPath{process, "/cmdline"}.get(), buffer));
+        const auto status = readStatus(proc_, process);
+        if (!status || status->hasEnded()) {
+            return;
+        }
+        std::string doubt = doubtOf(proc_, process, client.name, *status);
+        if (client.name == dhcpcdName) {
+            parts_.push_back({.pid = numberOf(process),
+                              .parent = status->parent,
+                              .ofRoot = doubt.empty() && status->user == 0,
+                              .hearsOthers = !arguments.empty() &&
+                                             arguments.front().starts_with("dhcpcd: [BPF ARP]")});
+        }
+        auto found = client.parse(arguments);
+        if (!found) {
+            return;
+        }
+        found->pid = numberOf(process);
+        found->user = status->user;
+        candidates_.push_back({.number = std::string{process},
+                               .name = client.name,
+                               .process = *std::move(found),
+                               .status = *status,
+                               .doubt = std::move(doubt)});
+    }
+
+    void readManager(std::string_view process, const KnownManager& manager) {
+        const auto status = readStatus(proc_, process);
+        if (!status || status->hasEnded()) {
+            return;
+        }
+        const auto where = whereIs(proc_, process, ownNamespace_);
+        const std::string doubt = doubtOf(proc_, process, manager.name, *status);
+        if (doubt.empty()) {
+            facts_.managers.push_back({.client = manager.client,
+                                       .where = where,
+                                       .pid = numberOf(process),
+                                       .user = status->user});
+        } else if (where != ManagerProcess::Where::Elsewhere) {
+            facts_.diagnostics.push_back(implausible(process, manager.name, doubt));
+        }
+    }
+
+    void judge(Candidate& candidate) {
+        const auto where = whereIs(proc_, candidate.number, ownNamespace_);
+        const int error = errno;
+        if (where == ManagerProcess::Where::Elsewhere) {
+            return;
+        }
+        if (!candidate.doubt.empty() && !hasPartOfRoot(candidate)) {
+            facts_.diagnostics.push_back(
+                implausible(candidate.number, candidate.name, candidate.doubt));
+        } else if (where == ManagerProcess::Where::Here) {
+            candidate.process.heardLinks = heardBy(candidate);
+            facts_.processes.push_back(std::move(candidate.process));
+        } else if (error == EACCES || error == EPERM) {
+            facts_.diagnostics.emplace_back(
+                "cannot tell the links of process " + candidate.number + " (" +
+                    std::string{nameOf(candidate.process.client)} + "): " + reasonOf(error),
+                Diagnostic::Kind::Denied);
+            facts_.hiddenClients.push_back(std::move(candidate.process));
+        }
+    }
+
+    /// Whether a process of dhcpcd gave up its rights, and has another one of root for what
+    /// needs them. No other user can have such a one.
+    [[nodiscard]] bool hasPartOfRoot(const Candidate& candidate) const {
+        return candidate.process.client == Client::Dhcpcd &&
+               std::any_of(parts_.begin(), parts_.end(), [&](const Part& part) {
+                   return part.ofRoot && (part.parent == candidate.process.pid ||
+                                          part.pid == candidate.status.parent);
+               });
+    }
+
+    /// The processes of which a client consists.
+    [[nodiscard]] std::vector<std::int32_t> processesOf(const Candidate& candidate) const {
+        std::vector<std::int32_t> pids{candidate.process.pid};
+        if (candidate.process.client != Client::Dhcpcd) {
+            return pids;
+        }
+        for (std::size_t i = 0; i < pids.size(); ++i) {
+            for (const Part& part : parts_) {
+                if (part.parent == pids[i] && !part.hearsOthers &&
+                    std::find(pids.begin(), pids.end(), part.pid) == pids.end()) {
+                    pids.push_back(part.pid);
+                }
+            }
+        }
+        return pids;
+    }
+
+    /// The links of a client's packet sockets; nullopt when that is not to be known.
+    std::optional<std::vector<std::uint32_t>> heardBy(const Candidate& candidate) {
+        if (!packetSockets_) {
+            packetSockets_ = readPacketSockets(roots_, facts_.diagnostics);
+        }
+        std::vector<std::uint32_t> links;
+        for (const std::int32_t pid : processesOf(candidate)) {
+            Directory descriptors{roots_.proc + '/' + std::to_string(pid) + "/fd"};
+            if (!descriptors) {
+                return std::nullopt;
+            }
+            addHeard(descriptors, links);
+        }
+        return links;
+    }
+
+    void addHeard(Directory& descriptors, std::vector<std::uint32_t>& links) const {
+        constexpr std::string_view prefix = "socket:[";
+        for (std::string_view name = descriptors.next(); !name.empty(); name = descriptors.next()) {
+            const std::string target =
+                readLink(descriptors.descriptor(), ProcessPath{name, ""}.get());
+            if (!target.starts_with(prefix)) {
+                continue;
+            }
+            const auto inode = parseNumber<std::uint64_t>(
+                std::string_view{target}.substr(prefix.size(), target.size() - prefix.size() - 1));
+            for (const PacketSocket& socket : *packetSockets_) {
+                if (socket.inode == inode &&
+                    std::find(links.begin(), links.end(), socket.link) == links.end()) {
+                    links.push_back(socket.link);
+                }
+            }
+        }
+    }
+
+    /// Process 1 is another user's. Where even root may not see it, a mount option of /proc
+    /// keeps this process from seeing those of others (hidepid, proc(5)).
+    void findHiding() {
+        struct statfs system {};
+        const bool real = ::fstatfs(proc_, &system) == 0 && system.f_type == PROC_SUPER_MAGIC;
+        if (real && ::faccessat(proc_, "1/comm", F_OK, 0) != 0) {
+            facts_.processesHidden = true;
+            facts_.diagnostics.emplace_back(
+                roots_.proc + " hides the processes of other users: a DHCP client among them " +
+                    "is not seen",
+                Diagnostic::Kind::Denied);
+        }
+    }
+
+    const Roots& roots_;
+    Directory& directory_;
+    const int proc_;
+    const std::string ownNamespace_;
+    ClientFacts& facts_;
+    std::vector<Candidate> candidates_;
+    std::vector<Part> parts_;
+    std::optional<std::vector<PacketSocket>> packetSockets_;
+};
 
 }  // namespace
 
@@ -197,38 +462,7 @@ void readProcesses(const Roots& roots, ClientFacts& facts) {
         facts.diagnostics.push_back(unreadable(roots.proc, errno));
         return;
     }
-    const int proc = directory.descriptor();
-    // Of this thread: namespaces belong to threads, not to processes.
-    const std::string ownNamespace = readNamespace(proc, "thread-self/ns/net");
-    const std::vector<std::int32_t> ofKernel = kernelThreads(proc);
-    for (std::string_view process = directory.next(); !process.empty();
-         process = directory.next()) {
-        if (process.front() < '1' || process.front() > '9' ||
-            std::binary_search(ofKernel.begin(), ofKernel.end(), numberOf(process))) {
-            continue;
-        }
-        std::array<char, 32> buffer{};
-        std::string_view name = readShort(proc, ProcessPath{process, "/comm"}.get(), buffer);
-        name = name.substr(0, name.find('\n'));
-        const auto* const client =
-            std::find_if(knownClients.begin(), knownClients.end(),
-                         [&](const KnownClient& known) { return known.name == name; });
-        if (client != knownClients.end()) {
-            readClient(proc, process, *client, ownNamespace, facts);
-            continue;
-        }
-        const auto* const manager =
-            std::find_if(knownManagers.begin(), knownManagers.end(),
-                         [&](const KnownManager& known) { return known.name == name; });
-        if (manager != knownManagers.end()) {
-            facts.managers.push_back({.client = manager->client,
-                                      .where = whereIs(proc, process, ownNamespace),
-                                      .pid = numberOf(process)});
-        }
-    }
-    if (errno != 0) {
-        facts.diagnostics.push_back(unreadable(roots.proc, errno));
-    }
+    Reader{roots, directory, facts}.readAll();
 }
 
 }  // namespace ZR::Live

@@ -213,7 +213,7 @@ void readWicked(const Roots& roots, ClientFacts& facts) {
             }
             auto parsed = parseWickedLease(*text);
             if (const auto* const reason = std::get_if<std::string_view>(&parsed)) {
-                facts.diagnostics.push_back("cannot use " + path + ": " + std::string{*reason});
+                facts.diagnostics.emplace_back("cannot use " + path + ": " + std::string{*reason});
             } else {
                 addLeases(std::get<WickedLease>(parsed), *interface, path, facts);
             }

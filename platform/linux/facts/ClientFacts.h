@@ -10,6 +10,7 @@
 #include "facts/RunningPrograms.h"
 #include "kernel/Sockets.h"
 #include "kernel/WatchedPlace.h"
+#include "zrclient/Diagnostic.h"
 
 namespace ZR::Live {
 
@@ -21,18 +22,17 @@ struct ClientFacts {
     std::vector<LinkConfiguration> configurations;  ///< of files that such programs would read
     std::vector<ClientProcess> processes;
     std::vector<ManagerProcess> managers;
+    /// Clients of which this user may not know whether they run in this network namespace.
+    std::vector<ClientProcess> hiddenClients;
+    bool processesHidden = false;  ///< those of other users, as by hidepid=2 (proc(5))
     ClientSockets sockets;
     std::optional<BootResponse> boot;
     std::vector<WatchedPlace> places;  ///< what was read beyond the fixed places
-    std::vector<std::string> diagnostics;
+    std::vector<Diagnostic> diagnostics;
 
     /// Whether a program that manages links runs for this network namespace. One
     /// whose namespace is hidden is believed: the files that it left are beside ours.
     [[nodiscard]] bool runs(Client client) const noexcept;
-
-    /// Whether the sockets may be all that there is to see of a DHCPv4 client: no program
-    /// that could have them was found for this network namespace.
-    [[nodiscard]] bool socketsStandAlone() const noexcept;
 
     /// Whether such a program runs for other network namespaces alone: the indexes in
     /// its files are then those of other links.

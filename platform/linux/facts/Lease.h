@@ -4,6 +4,7 @@
 #include <limits>
 #include <optional>
 #include <string>
+#include <vector>
 
 #include "facts/Client.h"
 #include "formats/InterfaceName.h"
@@ -29,6 +30,14 @@ struct Lease {
     /// End in seconds since the epoch; nullopt when the client keeps only a
     /// duration, and takes the claim back itself.
     std::optional<std::int64_t> expires;
+    /// When the server last confirmed the lease, in seconds since the epoch; nullopt when
+    /// the client does not keep it.
+    std::optional<std::int64_t> obtained{};
+    std::optional<std::int64_t> renews{};   ///< T1, likewise
+    std::optional<std::int64_t> rebinds{};  ///< T2, likewise
+    std::vector<std::uint16_t> options{};   ///< codes of the options that came, in their order
+    std::string clientIdentifier{};         ///< as the client's file has it
+    std::int32_t pid = 0;                   ///< of the client's process; 0 when not known
     /// The client asked once and ended: after its end, too, the address stays as it is.
     bool outlivesEnd = false;
     std::string origin{};  ///< the file that says so

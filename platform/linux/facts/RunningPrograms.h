@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstdint>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -16,6 +17,10 @@ struct ClientProcess {
     std::string leaseFile;                  ///< empty: the client's default
     bool ipv6 = false;                      ///< DHCPv6 in place of DHCPv4
     std::int32_t pid = 0;                   ///< process number; 0 before it is known
+    std::uint32_t user = 0;                 ///< effective user
+    /// Indexes of the links on which a packet socket of it listens; nullopt when that is
+    /// not to be known. A link can be renamed under a client, its index stays.
+    std::optional<std::vector<std::uint32_t>> heardLinks{};
 
     /// Whether it was told to serve this interface, or all.
     [[nodiscard]] bool serves(const InterfaceName& interface) const noexcept;
@@ -30,6 +35,7 @@ struct ManagerProcess {
     Client client{};
     Where where = Where::Unknown;
     std::int32_t pid = 0;
+    std::uint32_t user = 0;  ///< effective user
 
     bool operator==(const ManagerProcess&) const = default;
 };

@@ -4,7 +4,9 @@
 
 #include <algorithm>
 #include <array>
+#include <string_view>
 #include <tuple>
+#include <utility>
 
 namespace ZR::Live {
 namespace {
@@ -30,6 +32,9 @@ constexpr unsigned leaseTimeOption = 51;
 constexpr unsigned overloadOption = 52;
 constexpr unsigned messageTypeOption = 53;
 constexpr unsigned serverOption = 54;
+constexpr unsigned renewalOption = 58;
+constexpr unsigned rebindingOption = 59;
+constexpr unsigned clientOption = 61;
 constexpr unsigned endOption = 255;
 constexpr unsigned overloadsFile = 1;
 constexpr unsigned overloadsServerName = 2;
@@ -37,10 +42,13 @@ constexpr unsigned overloadsServerName = 2;
 // RFC 8415.
 constexpr unsigned replyMessage = 7;
 constexpr std::size_t messageHeaderSize = 4;
+constexpr unsigned clientOption6 = 1;
 constexpr unsigned associationOption = 3;           // IA_NA
 constexpr unsigned temporaryAssociationOption = 4;  // IA_TA
 constexpr unsigned addressOption = 5;
 constexpr std::size_t associationHeaderSize = 12;
+constexpr std::size_t renewalAt = 4;
+constexpr std::size_t rebindingAt = 8;
 constexpr std::size_t temporaryAssociationHeaderSize = 4;
 constexpr std::size_t longAddressSize = 16;
 constexpr std::size_t addressHeaderSize = 24;
@@ -60,12 +68,37 @@ std::uint32_t number(Bytes bytes) {
     return value;
 }
 
+/// Bytes in hexadecimal, as in "01:52:54".
+std::string hexadecimal(Bytes bytes) {
+    constexpr std::string_view digits = "0123456789abcdef";
+    std::string text;
+    for (const std::byte byte : bytes) {
+        if (!text.empty()) {
+            text += ':';
+        }
+        text += digits[std::to_integer<unsigned>(byte) >> 4U];
+        text += digits[std::to_integer<unsigned>(byte) & 0xFU];
+    }
+    return text;
+}
+
+void addOnce(unsigned code, std::vector<std::uint16_t>& codes) {
+    const auto number = static_cast<std::uint16_t>(code);
+    if (std::find(codes.begin(), codes.end(), number) == codes.end()) {
+        codes.push_back(number);
+    }
+}
+
 /// The options that matter here, each with all its parts.
 struct Options {
+    std::vector<std::uint16_t> codes;
     std::vector<std::byte> leaseTime;
     std::vector<std::byte> overload;
     std::vector<std::byte> messageType;
     std::vector<std::byte> server;
+    std::vector<std::byte> renewal;
+    std::vector<std::byte> rebinding;
+    std::vector<std::byte> client;
 
     std::vector<std::byte>* find(unsigned code) {
         switch (code) {
@@ -77,6 +110,12 @@ struct Options {
                 return &messageType;
             case serverOption:
                 return &server;
+            case renewalOption:
+                return &renewal;
+            case rebindingOption:
+                return &rebinding;
+            case clientOption:
+                return &client;
             default:
                 return nullptr;
         }
@@ -101,6 +140,7 @@ std::string_view gather(Bytes area, Options& options, bool& ended) {
             return optionTooLong;
         }
         const Bytes value = area.subspan(2, at(area, 1));
+        addOnce(code, options.codes);
         if (auto* const kept = options.find(code)) {
             kept->insert(kept->end(), value.begin(), value.end());
         }
@@ -127,10 +167,19 @@ bool forEachOption6(Bytes area, Action action) {
     return true;
 }
 
+/// The time at a place of an association; nullopt for 0, which leaves it to the client.
+std::optional<std::uint32_t> timeAt(Bytes association, std::size_t position) {
+    const std::uint32_t time = number(association.subspan(position, sizeof(std::uint32_t)));
+    return time == 0 ? std::nullopt : std::optional{time};
+}
+
 bool gatherAddresses(Bytes association, std::size_t header, Dhcp6Reply& reply) {
     if (association.size() < header) {
         return false;
     }
+    const bool timed = header == associationHeaderSize;
+    const auto renewal = timed ? timeAt(association, renewalAt) : std::nullopt;
+    const auto rebinding = timed ? timeAt(association, rebindingAt) : std::nullopt;
     return forEachOption6(association.subspan(header), [&](unsigned code, Bytes value) {
         if (code != addressOption) {
             return true;
@@ -141,7 +190,10 @@ bool gatherAddresses(Bytes association, std::size_t header, Dhcp6Reply& reply) {
         const std::uint32_t lifetime = number(value.subspan(validLifetimeAt, 4));
         const auto address = IpAddress::fromBytes(AF_INET6, value.first(longAddressSize));
         if (address && lifetime != 0) {  // 0 takes the address back
-            reply.addresses.push_back({.address = *address, .validLifetime = lifetime});
+            reply.addresses.push_back({.address = *address,
+                                       .validLifetime = lifetime,
+                                       .renewal = renewal,
+                                       .rebinding = rebinding});
         }
         return true;
     });
@@ -189,9 +241,14 @@ Parsed<DhcpReply> parseDhcpReply(Bytes message) {
     }
     reply.server = IpAddress::fromBytes(AF_INET, options.server);
     reply.bootp = options.messageType.empty();
-    if (options.leaseTime.size() == sizeof(std::uint32_t)) {
-        reply.leaseTime = number(options.leaseTime);
-    }
+    const auto seconds = [](const std::vector<std::byte>& value) {
+        return value.size() == sizeof(std::uint32_t) ? std::optional{number(value)} : std::nullopt;
+    };
+    reply.leaseTime = seconds(options.leaseTime);
+    reply.renewal = seconds(options.renewal);
+    reply.rebinding = seconds(options.rebinding);
+    reply.options = std::move(options.codes);
+    reply.clientIdentifier = hexadecimal(options.client);
     return reply;
 }
 
@@ -205,6 +262,10 @@ Parsed<Dhcp6Reply> parseDhcp6Reply(Bytes message) {
     Dhcp6Reply reply;
     const bool whole =
         forEachOption6(message.subspan(messageHeaderSize), [&](unsigned code, Bytes value) {
+            addOnce(code, reply.options);
+            if (code == clientOption6) {
+                reply.clientIdentifier = hexadecimal(value);
+            }
             if (code == associationOption) {
                 return gatherAddresses(value, associationHeaderSize, reply);
             }

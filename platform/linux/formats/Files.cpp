@@ -23,12 +23,14 @@ std::string pathIn(const std::string& directory, std::string_view name) {
     return path;
 }
 
-std::string unreadable(std::string_view path, int error) {
-    return "cannot read " + std::string{path} + ": " + reasonOf(error);
+Diagnostic unreadable(std::string_view path, int error) {
+    return Diagnostic{"cannot read " + std::string{path} + ": " + reasonOf(error),
+                      error == EACCES || error == EPERM ? Diagnostic::Kind::Denied
+                                                        : Diagnostic::Kind::Unreadable};
 }
 
 std::optional<std::string> readOptionalFile(const std::string& path,
-                                            std::vector<std::string>& diagnostics) {
+                                            std::vector<Diagnostic>& diagnostics) {
     auto content = File::read(path, largestFile);
     if (!content && !isAbsent(errno)) {
         diagnostics.push_back(unreadable(path, errno));
@@ -37,7 +39,7 @@ std::optional<std::string> readOptionalFile(const std::string& path,
 }
 
 std::vector<std::string> listOptionalDirectory(const std::string& path,
-                                               std::vector<std::string>& diagnostics) {
+                                               std::vector<Diagnostic>& diagnostics) {
     std::vector<std::string> names;
     Directory directory{path};
     if (!directory) {

@@ -16,7 +16,7 @@ bool IpmiReader::changed() {
     return known_ != given_;
 }
 
-std::optional<ServiceProcessor> IpmiReader::read(std::vector<std::string>& diagnostics) {
+std::optional<ServiceProcessor> IpmiReader::read(std::vector<Diagnostic>& diagnostics) {
     advance();
     given_ = known_;
     diagnostics.insert(diagnostics.end(), known_.diagnostics.begin(), known_.diagnostics.end());
@@ -63,18 +63,18 @@ void IpmiReader::settle() {
     } else {
         failures_ = 0;
         known_ = {.processor = ServiceProcessor{conversation_->lan()}, .diagnostics = {}};
-        for (const std::string& diagnostic : conversation_->diagnostics()) {
-            known_.diagnostics.push_back("service processor: " + diagnostic);
+        for (const std::string& reason : conversation_->diagnostics()) {
+            known_.diagnostics.emplace_back("service processor: " + reason);
         }
     }
     conversation_.reset();
     transport_->close();
 }
 
-void IpmiReader::fail(std::vector<std::string> diagnostics) {
+void IpmiReader::fail(const std::vector<std::string>& reasons) {
     known_.diagnostics.clear();
-    for (std::string& diagnostic : diagnostics) {
-        known_.diagnostics.push_back("service processor: " + std::move(diagnostic));
+    for (const std::string& reason : reasons) {
+        known_.diagnostics.emplace_back("service processor: " + reason);
     }
     if (++failures_ > toleratedFailures) {
         known_.processor->lan.reset();

@@ -10,6 +10,7 @@
 #include "ipmi/IpmiConversation.h"
 #include "ipmi/IpmiTransport.h"
 #include "ipmi/ServiceProcessor.h"
+#include "zrclient/Diagnostic.h"
 
 namespace ZR::Live {
 
@@ -42,12 +43,12 @@ class IpmiReader {
 
     /// What is known; nullopt when the machine has no service processor. Adds the reasons
     /// why no more is known to the diagnostics.
-    [[nodiscard]] std::optional<ServiceProcessor> read(std::vector<std::string>& diagnostics);
+    [[nodiscard]] std::optional<ServiceProcessor> read(std::vector<Diagnostic>& diagnostics);
 
   private:
     struct Knowledge {
         std::optional<ServiceProcessor> processor;
-        std::vector<std::string> diagnostics;
+        std::vector<Diagnostic> diagnostics;
 
         bool operator==(const Knowledge&) const = default;
     };
@@ -55,7 +56,7 @@ class IpmiReader {
     void advance();
     void begin(std::chrono::steady_clock::time_point now);
     void settle();
-    void fail(std::vector<std::string> diagnostics);
+    void fail(const std::vector<std::string>& reasons);
 
     std::unique_ptr<IpmiTransport> transport_;
     Clock clock_;

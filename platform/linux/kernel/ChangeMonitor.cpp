@@ -40,7 +40,7 @@ int addWatch(int fd, const std::string& directory, std::uint32_t events) {
 }  // namespace
 
 void ChangeMonitor::begin(const std::vector<WatchedPlace>& places,
-                          std::vector<std::string>& diagnostics) {
+                          std::vector<Diagnostic>& diagnostics) {
     if (blind_) {
         rearm_ = true;
         blind_ = false;
@@ -113,7 +113,7 @@ void ChangeMonitor::watchProcesses(std::span<const std::int32_t> pids) {
     processes_ = std::move(processes);
 }
 
-void ChangeMonitor::openSubscription(std::vector<std::string>& diagnostics) {
+void ChangeMonitor::openSubscription(std::vector<Diagnostic>& diagnostics) {
     if (subscription_) {
         return;
     }
@@ -124,13 +124,13 @@ void ChangeMonitor::openSubscription(std::vector<std::string>& diagnostics) {
     address.nl_groups = RTMGRP_LINK | RTMGRP_IPV4_IFADDR | RTMGRP_IPV6_IFADDR;
     const auto* const generic = static_cast<const sockaddr*>(static_cast<const void*>(&address));
     if (!subscription_ || ::bind(subscription_.get(), generic, sizeof address) != 0) {
-        diagnostics.push_back("cannot subscribe to network changes: " + reasonOf(errno));
+        diagnostics.emplace_back("cannot subscribe to network changes: " + reasonOf(errno));
         subscription_.reset();
         blind_ = true;
     }
 }
 
-void ChangeMonitor::openWatches(std::vector<std::string>& diagnostics) {
+void ChangeMonitor::openWatches(std::vector<Diagnostic>& diagnostics) {
     if (watches_) {
         return;
     }
@@ -138,7 +138,7 @@ void ChangeMonitor::openWatches(std::vector<std::string>& diagnostics) {
     rearm_ = true;
     watches_.reset(::inotify_init1(IN_NONBLOCK | IN_CLOEXEC));
     if (!watches_) {
-        diagnostics.push_back("cannot watch files: " + reasonOf(errno));
+        diagnostics.emplace_back("cannot watch files: " + reasonOf(errno));
         blind_ = true;
     }
 }
@@ -174,7 +174,7 @@ struct ChangeMonitor::Arming {
 };
 
 void ChangeMonitor::watchAll(const std::vector<WatchedPlace>& places,
-                             std::vector<std::string>& diagnostics) {
+                             std::vector<Diagnostic>& diagnostics) {
     Arming arming;
     for (const WatchedPlace& place : places) {
         watch(place, arming, diagnostics);
@@ -190,7 +190,7 @@ void ChangeMonitor::watchAll(const std::vector<WatchedPlace>& places,
 }
 
 void ChangeMonitor::watch(const WatchedPlace& place, Arming& arming,
-                          std::vector<std::string>& diagnostics) {
+                          std::vector<Diagnostic>& diagnostics) {
     const auto notice = [&](int watch) {
         arming.interests[watch].push_back({.name = place.namePrefix, .ancestor = false});
     };
@@ -221,7 +221,7 @@ void ChangeMonitor::watch(const WatchedPlace& place, Arming& arming,
         return;
     }
     // Anything else, like a limit that was reached, leaves changes unnoticed.
-    diagnostics.push_back("cannot watch " + place.directory + ": " + reasonOf(error));
+    diagnostics.emplace_back("cannot watch " + place.directory + ": " + reasonOf(error));
     blind_ = true;
 }
 

@@ -10,6 +10,7 @@
 #include <vector>
 
 #include "kernel/WatchedPlace.h"
+#include "zrclient/Diagnostic.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace ZR::Live {
@@ -28,7 +29,7 @@ class ChangeMonitor {
 
     /// Watches exactly these places from now on and forgets what happened before.
     /// To be called before the state is read, so that nothing falls in between.
-    void begin(const std::vector<WatchedPlace>& places, std::vector<std::string>& diagnostics);
+    void begin(const std::vector<WatchedPlace>& places, std::vector<Diagnostic>& diagnostics);
 
     /// Watches these processes for their end, and no others. One that has ended
     /// already counts as a change. Where the kernel cannot watch processes (before
@@ -51,10 +52,10 @@ class ChangeMonitor {
 
     struct Arming;
 
-    void openSubscription(std::vector<std::string>& diagnostics);
-    void openWatches(std::vector<std::string>& diagnostics);
-    void watchAll(const std::vector<WatchedPlace>& places, std::vector<std::string>& diagnostics);
-    void watch(const WatchedPlace& place, Arming& arming, std::vector<std::string>& diagnostics);
+    void openSubscription(std::vector<Diagnostic>& diagnostics);
+    void openWatches(std::vector<Diagnostic>& diagnostics);
+    void watchAll(const std::vector<WatchedPlace>& places, std::vector<Diagnostic>& diagnostics);
+    void watch(const WatchedPlace& place, Arming& arming, std::vector<Diagnostic>& diagnostics);
     int watchAncestor(std::string directory, Arming& arming) const;
     bool drainSubscription();
     bool drainWatches();

@@ -38,19 +38,46 @@ constexpr std::array<Description, 9> descriptions{{
     {"wwan", "Mobile broadband interface"},
 }};
 
+bool isLoopback(const Link& link) {
+    return link.arphrdType == ARPHRD_LOOPBACK || (link.flags & IFF_LOOPBACK) != 0;
+}
+
+bool isDevice(const Link& link) {
+    return link.hasParentDevice || link.kind.empty();
+}
+
+/// An end of a virtual cable that is not a port of a switch.
+bool isCableEnd(const Link& link) {
+    return link.kind == "veth" && link.slaveKind != "bridge" && link.slaveKind != "openvswitch";
+}
+
 }  // namespace
 
+void WayOut::add(const Link& link, bool addressed) {
+    if (isLoopback(link)) {
+        return;
+    }
+    hasDevice_ = hasDevice_ || isDevice(link);
+    if (isCableEnd(link) && link.farNamespace && (!where_ || (addressed && !addressed_))) {
+        where_ = link.farNamespace;
+        addressed_ = addressed;
+    }
+}
+
+bool WayOut::isBy(const Link& link) const {
+    return !hasDevice_ && where_ && isCableEnd(link) && link.farNamespace == where_;
+}
+
 bool isNetworkInterface(const Link& link, bool addressed) {
-    if (link.arphrdType == ARPHRD_LOOPBACK || (link.flags & IFF_LOOPBACK) != 0) {
+    if (isLoopback(link)) {
         return false;
     }
-    if (link.hasParentDevice || link.kind.empty()) {
+    if (isDevice(link)) {
         return true;
     }
-    if (link.kind == "veth") {
-        // In a container this is the one interface there is. The other end, outside,
-        // has no address or is a port of a bridge.
-        return addressed && link.slaveKind != "bridge" && link.slaveKind != "openvswitch";
+    if (isCableEnd(link)) {
+        // The end outside of a container has no address as a rule.
+        return addressed;
     }
     // What is left out: tunnels, test devices, vrf, and kinds that are not known here.
     return contains(addressHolders, link.kind);

@@ -54,6 +54,9 @@ bool parseAttribute(const Attribute& attribute, Link& link) {
         case IFLA_MASTER:
             link.master = valueAt<std::uint32_t>(attribute.payload).value_or(0);
             return true;
+        case IFLA_LINK_NETNSID:
+            link.farNamespace = valueAt<std::int32_t>(attribute.payload);
+            return true;
         case IFLA_LINKINFO:
             return parseLinkInfo(attribute.payload, link);
         case parentDeviceName:

@@ -83,14 +83,14 @@ bool RtnetlinkReader::dump(std::uint16_t request, const char* what, Parse parse,
     const std::string about = std::string{"network "} + what + ": ";
     if (outcome.unreadable != 0) {
         state.certain = false;
-        state.diagnostics.push_back(about + std::to_string(outcome.unreadable) +
-                                    " malformed messages left out");
+        state.diagnostics.emplace_back(about + std::to_string(outcome.unreadable) +
+                                       " malformed messages left out");
     }
     if (outcome.end == End::Complete) {
         return true;
     }
     state.certain = false;
-    state.diagnostics.push_back(about + outcome.reason);
+    state.diagnostics.emplace_back(about + outcome.reason);
     if (outcome.end == End::Interrupted) {
         return true;
     }

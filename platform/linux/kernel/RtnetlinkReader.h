@@ -9,6 +9,7 @@
 #include "kernel/Address.h"
 #include "kernel/Link.h"
 #include "kernel/NetlinkTransport.h"
+#include "zrclient/Diagnostic.h"
 
 namespace ZR::Live {
 
@@ -17,7 +18,7 @@ struct NetworkState {
     std::vector<Link> links;         ///< empty when they could not be read
     std::vector<Address> addresses;  ///< empty when they could not be read
     bool certain = true;             ///< false: incomplete, or mixed from two moments; read again
-    std::vector<std::string> diagnostics;
+    std::vector<Diagnostic> diagnostics;
 
     bool operator==(const NetworkState&) const = default;
 };

@@ -13,6 +13,7 @@
 
 #include "formats/Files.h"
 #include "formats/Numbers.h"
+#include "formats/Trust.h"
 
 namespace ZR::Live {
 namespace {
@@ -73,46 +74,96 @@ std::optional<EndPoint> parseEndPoint(std::string_view text) {
     return point;
 }
 
+/// A table of this network namespace.
+std::string ownNetwork(const Roots& roots, std::string_view table) {
+    // Of this thread: namespaces belong to threads, not to processes.
+    return pathIn(roots.proc + "/thread-self/net", table);
+}
+
+/// Whether only root, and who has the capability for it, may bind the clients' port.
+bool isPrivileged(const Roots& roots, std::vector<Diagnostic>& diagnostics) {
+    constexpr std::uint32_t alwaysSo = 1024;  // before Linux 4.11, which made it a setting
+    const auto text =
+        readOptionalFile(roots.proc + "/sys/net/ipv4/ip_unprivileged_port_start", diagnostics);
+    if (!text) {
+        return true;
+    }
+    return parseNumber<std::uint32_t>(text->substr(0, text->find('\n'))).value_or(alwaysSo) >
+           clientPort;
+}
+
+void removeUntrusted(const Roots& roots, std::span<const uid_t> users,
+                     std::vector<PortSocket>& sockets, std::vector<Diagnostic>& diagnostics) {
+    const auto isDoubtful = [&](const PortSocket& socket) {
+        return socket.user != 0 &&
+               std::find(users.begin(), users.end(), socket.user) == users.end();
+    };
+    if (std::none_of(sockets.begin(), sockets.end(), isDoubtful) ||
+        isPrivileged(roots, diagnostics)) {
+        return;
+    }
+    std::erase_if(sockets, [&](const PortSocket& socket) {
+        const bool doubtful = isDoubtful(socket);
+        if (doubtful) {
+            diagnostics.push_back(
+                untrusted("a socket of user " + std::to_string(socket.user) + " on UDP port 68",
+                          "every user may open one here"));
+        }
+        return doubtful;
+    });
+}
+
 }  // namespace
 
 std::vector<PortSocket> parseUdpSockets(std::string_view text) {
     std::vector<PortSocket> sockets;
-    // Number, own end, other end.
-    forEachLine<3>(text, [&](const std::array<std::string_view, 3>& words) {
+    // Number, own end, other end, state, queues, timer, retransmissions, user.
+    forEachLine<8>(text, [&](const std::array<std::string_view, 8>& words) {
         const auto own = parseEndPoint(words[1]);
         const auto other = parseEndPoint(words[2]);
-        if (own && other && own->port == clientPort) {
-            sockets.push_back({.address = own->address, .peer = other->address});
+        const auto user = parseNumber<std::uint32_t>(words[7]);
+        if (own && other && user && own->port == clientPort) {
+            sockets.push_back({.address = own->address, .peer = other->address, .user = *user});
         }
     });
     return sockets;
 }
 
-std::vector<std::uint32_t> parsePacketLinks(std::string_view text) {
-    std::vector<std::uint32_t> links;
-    // Address, references, type, protocol, link.
-    forEachLine<5>(text, [&](const std::array<std::string_view, 5>& words) {
+std::vector<PacketSocket> parsePacketSockets(std::string_view text) {
+    std::vector<PacketSocket> sockets;
+    // Address, references, type, protocol, link, running, memory, user, inode.
+    forEachLine<9>(text, [&](const std::array<std::string_view, 9>& words) {
         const std::uint16_t protocol =
             parseNumber<std::uint16_t>(words[3], hexadecimal).value_or(0);
         const auto link = parseNumber<std::uint32_t>(words[4]);
+        const auto inode = parseNumber<std::uint64_t>(words[8]);
         const bool heard = protocol == everyProtocol || protocol == ipv4Protocol;
-        if (heard && link && *link != 0 &&
-            std::find(links.begin(), links.end(), *link) == links.end()) {
-            links.push_back(*link);
+        if (heard && link && *link != 0 && inode) {
+            sockets.push_back({.link = *link, .inode = *inode});
         }
     });
-    return links;
+    return sockets;
 }
 
-ClientSockets readSockets(const Roots& roots, std::vector<std::string>& diagnostics) {
-    // Of this thread: namespaces belong to threads, not to processes.
-    const std::string directory = roots.proc + "/thread-self/net";
+std::vector<PacketSocket> readPacketSockets(const Roots& roots,
+                                            std::vector<Diagnostic>& diagnostics) {
+    return parsePacketSockets(
+        readOptionalFile(ownNetwork(roots, "packet"), diagnostics).value_or(""));
+}
+
+ClientSockets readSockets(const Roots& roots, std::vector<Diagnostic>& diagnostics,
+                          std::span<const uid_t> users) {
     ClientSockets sockets;
-    const auto udp = readOptionalFile(pathIn(directory, "udp"), diagnostics);
+    const auto udp = readOptionalFile(ownNetwork(roots, "udp"), diagnostics);
     sockets.bound = parseUdpSockets(udp.value_or(""));
+    removeUntrusted(roots, users, sockets.bound, diagnostics);
     if (!sockets.bound.empty()) {
-        const auto packet = readOptionalFile(pathIn(directory, "packet"), diagnostics);
-        sockets.packetLinks = parsePacketLinks(packet.value_or(""));
+        for (const PacketSocket& socket : readPacketSockets(roots, diagnostics)) {
+            auto& links = sockets.packetLinks;
+            if (std::find(links.begin(), links.end(), socket.link) == links.end()) {
+                links.push_back(socket.link);
+            }
+        }
     }
     return sockets;
 }

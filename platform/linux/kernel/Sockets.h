@@ -1,13 +1,17 @@
 #pragma once
 
+#include <sys/types.h>
+
 #include <cstdint>
 #include <optional>
+#include <span>
 #include <string>
 #include <string_view>
 #include <vector>
 
 #include "formats/IpAddress.h"
 #include "formats/Roots.h"
+#include "zrclient/Diagnostic.h"
 
 namespace ZR::Live {
 
@@ -15,6 +19,7 @@ namespace ZR::Live {
 struct PortSocket {
     std::optional<IpAddress> address;  ///< of IPv4; nullopt: of all links
     std::optional<IpAddress> peer;     ///< the one address that it talks to
+    uid_t user = 0;                    ///< who opened it
 
     bool operator==(const PortSocket&) const = default;
 };
@@ -31,13 +36,31 @@ struct ClientSockets {
 /// of that form are skipped.
 [[nodiscard]] std::vector<PortSocket> parseUdpSockets(std::string_view text);
 
-/// The links of the packet sockets that hear IPv4 in a text of the form of
-/// /proc/net/packet, each once. Such a socket alone proves nothing: it may be a sniffer's.
-[[nodiscard]] std::vector<std::uint32_t> parsePacketLinks(std::string_view text);
+/// A packet socket of one link that hears IPv4 there. Such a socket alone proves nothing: it
+/// may be a sniffer's.
+struct PacketSocket {
+    std::uint32_t link = 0;   ///< index, never 0
+    std::uint64_t inode = 0;  ///< the number in "socket:[NUMBER]" of /proc/PID/fd
+
+    bool operator==(const PacketSocket&) const = default;
+};
+
+/// Those in a text of the form of /proc/net/packet. Lines that are not of that form are
+/// skipped.
+[[nodiscard]] std::vector<PacketSocket> parsePacketSockets(std::string_view text);
+
+/// Those of this network namespace.
+[[nodiscard]] std::vector<PacketSocket> readPacketSockets(const Roots& roots,
+                                                          std::vector<Diagnostic>& diagnostics);
 
 /// The sockets of this network namespace. Any user may read them, also where the
 /// processes that have them are hidden. Packet sockets are looked at only where there is
 /// a bound one.
-[[nodiscard]] ClientSockets readSockets(const Roots& roots, std::vector<std::string>& diagnostics);
+///
+/// Where every user may bind the port (net.ipv4.ip_unprivileged_port_start, ip(7)), only the
+/// sockets of root and of `users`, those of the running clients and managers, are believed.
+/// The others give a diagnostic.
+[[nodiscard]] ClientSockets readSockets(const Roots& roots, std::vector<Diagnostic>& diagnostics,
+                                        std::span<const uid_t> users = {});
 
 }  // namespace ZR::Live

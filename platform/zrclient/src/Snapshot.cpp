@@ -87,13 +87,8 @@ std::string_view Snapshot::origin(Index index, NodeLexicon::Properties id) const
 }
 
 Snapshot::Index Snapshot::first(NodeLexicon::NodeType type) const noexcept {
-    switch (type) {
-        case NodeLexicon::NodeType::NetworkInterface:
-            return firstNetworkInterface_;
-        case NodeLexicon::NodeType::ComputerSystem:
-            return firstComputerSystem_;
-    }
-    return none;  // a number that the lexicon does not have
+    const auto place = NodeLexicon::placeOf(type);
+    return place ? firstOfType_.at(*place) : none;
 }
 
 std::string Snapshot::path(Index index) const {
@@ -171,22 +166,23 @@ std::shared_ptr<const Snapshot> SnapshotBuilder::build() {
     snapshot.properties_ = std::exchange(properties_, {});
     snapshot.origins_ = std::exchange(origins_, {});
     origin_.clear();
-    snapshot.remarks_ = std::exchange(remarks_, {});
+    snapshot.diagnostics_ = std::exchange(diagnostics_, {});
     // A snapshot is kept much longer than it takes to build it.
     snapshot.nodes_.shrink_to_fit();
     snapshot.properties_.shrink_to_fit();
 
     Keys keys;
-    Snapshot::Index* nextInterface = &snapshot.firstNetworkInterface_;
-    Snapshot::Index* nextSystem = &snapshot.firstComputerSystem_;
+    std::array<Snapshot::Index*, NodeLexicon::nodeTypes.size()> nextOfType{};
+    for (std::size_t place = 0; place < nextOfType.size(); ++place) {
+        nextOfType.at(place) = &snapshot.firstOfType_.at(place);
+    }
     for (Snapshot::Index index = 0; index < snapshot.nodes_.size(); ++index) {
         Snapshot::Node& node = snapshot.nodes_[index];
         keys.give(node, nameOf(node, snapshot.properties(index)));
         const auto type = NodeLexicon::nodeTypeOf(node.type);
-        if (type == NodeLexicon::NodeType::NetworkInterface) {
-            nextInterface = &(*nextInterface = index, node.nextOfType);
-        } else if (type == NodeLexicon::NodeType::ComputerSystem) {
-            nextSystem = &(*nextSystem = index, node.nextOfType);
+        if (const auto place = type ? NodeLexicon::placeOf(*type) : std::nullopt) {
+            *nextOfType.at(*place) = index;
+            nextOfType.at(*place) = &node.nextOfType;
         }
     }
     return std::make_shared<const Snapshot>(std::move(snapshot));

@@ -1,4 +1,5 @@
 #include "arguments/ValueReading.h"
+#include "cimom/ClassDeclaration.h"
 #include "cimom/Instance.h"
 
 #include <gtest/gtest.h>

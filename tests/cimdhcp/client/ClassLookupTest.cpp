@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include "cimom/ClassDeclaration.h"
 #include "kit/SmallSchema.h"
 
 namespace cimdhcp {

@@ -2,7 +2,6 @@
 
 #include <gtest/gtest.h>
 
-#include "cimom/ClassRepository.h"
 #include "zrclient/Snapshot.h"
 
 namespace cimdhcp {
@@ -13,22 +12,12 @@ using cimom::Type;
 using cimom::Value;
 using ZR::NodeLexicon::Properties;
 
-constexpr const char* schema = R"(
-Qualifier ValueMap : string[], Scope(property), Flavor(EnableOverride, ToSubclass);
-Qualifier Values : string[], Scope(property), Flavor(EnableOverride, ToSubclass);
-class Endpoint {
-    [ValueMap {"0", "2", "3"}, Values {"Unknown", "Enabled", "Disabled"}] uint16 EnabledState;
-    [ValueMap {"0", "6", "8"}, Values {"Unknown", "Init-Reboot", "Bound"}] uint16 ClientState;
-};
-)";
-
 cimom::Instance endpoint(const std::string& systemClass, const std::string& name,
-                         std::uint64_t enabled, std::uint64_t client) {
+                         std::uint64_t client) {
     cimom::Instance instance;
     instance.path.className = "Endpoint";
     instance.properties = {{"SystemCreationClassName", Value::ofString(systemClass)},
                            {"Name", Value::ofString(name)},
-                           {"EnabledState", {Type::uint16, false, Scalar(enabled)}},
                            {"ClientState", {Type::uint16, false, Scalar(client)}}};
     return instance;
 }
@@ -66,35 +55,31 @@ TEST(InterfaceIdText, IsSplitAtTheFirstSign) {
     EXPECT_EQ(readInterfaceId("eth0"), std::nullopt);
 }
 
-TEST(InterfacesOfAnotherMachine, AreThoseThatHaveASetting) {
-    EXPECT_EQ(interfacesOf({setting("Computer%eth0", "office"), setting("Computer%eth%1", ""),
-                            setting("BMC%eth0", ""), setting("nothing", "")},
-                           {ipEndpoint("host", "eth0", "192.0.2.17"),
-                            ipEndpoint("BMC:-1", "eth0", "192.0.2.18"),
-                            ipEndpoint("host", "eth9", "192.0.2.19")},
-                           {"BMC:-1"}),
-              (std::vector<InterfaceOverview>{
-                  {"Computer", "eth0", std::nullopt, "", "192.0.2.17", {}, ""},
-                  {"Computer", "eth%1", std::nullopt, "", "", {}, ""},
-                  {"BMC", "eth0", std::nullopt, "", "192.0.2.18", {}, ""}}));
+InterfaceOverview named(std::string_view system, const std::string& name) {
+    InterfaceOverview interface;
+    interface.system = system;
+    interface.name = name;
+    return interface;
 }
 
-class MachineInterfacesServed : public ::testing::Test {
-  protected:
-    MachineInterfacesServed() { repository_.loadText(schema, "small.mof"); }
-
-    std::vector<InterfaceOverview> with(const ServedInstances& served) const {
-        auto interfaces = interfaces_;
-        addServed(served, repository_, interfaces);
-        return interfaces;
-    }
-
-    cimom::ClassRepository repository_;
-    const std::vector<InterfaceOverview> interfaces_{
-        {"Computer", "eth0", std::nullopt, "active", "192.0.2.17", {}, ""},
-        {"Computer", "eth0_1", std::nullopt, "inactive", "", {}, ""},
-        {"BMC", "eth0", std::nullopt, "active", "", {}, ""}};
-};
+TEST(InterfacesOfAnotherMachine, AreThoseThatHaveASetting) {
+    const std::vector<cimom::Instance> settings{setting("Computer%eth0", "office"),
+                                                setting("Computer%eth%1", ""),
+                                                setting("BMC%eth0", ""), setting("nothing", "")};
+    std::vector<InterfaceOverview> expected{named(hostSystem, "eth0"), named(hostSystem, "eth%1"),
+                                            named(serviceProcessorSystem, "eth0")};
+    // Nothing of them is known but what is served.
+    EXPECT_EQ(interfacesOf(settings, std::nullopt, {}), expected);
+    expected[0].address = "192.0.2.17";
+    expected[1].address = "";
+    expected[2].address = "192.0.2.18";
+    EXPECT_EQ(interfacesOf(settings,
+                           std::vector{ipEndpoint("host", "eth0", "192.0.2.17"),
+                                       ipEndpoint("BMC:-1", "eth0", "192.0.2.18"),
+                                       ipEndpoint("host", "eth9", "192.0.2.19")},
+                           {"BMC:-1"}),
+              expected);
+}
 
 TEST(InterfacesOfATree, AreThoseOfItsNetworks) {
     ZR::SnapshotBuilder builder;
@@ -102,24 +87,129 @@ TEST(InterfacesOfATree, AreThoseOfItsNetworks) {
     const auto network = builder.add(computer, "Network", "Network");
     builder.add(network, "NetworkInterface", "Ethernet");
     builder.property(Properties::Name, std::string("eth0"));
+    builder.property(Properties::DHCPEnabled, true);
+    builder.property(Properties::AddressSource, std::uint64_t{1});
     builder.property(Properties::IPv4Address, std::string("192.0.2.17"));
     builder.property(Properties::InterfaceState, std::uint64_t{1});
     builder.add(network, "NetworkInterface", "Ethernet");
     builder.property(Properties::Name, std::string("eth1"));
+    builder.property(Properties::DHCPEnabled, false);
     builder.property(Properties::InterfaceState, std::uint64_t{0});
     builder.add(network, "NetworkInterface", "nameless");
     const auto bmc = builder.add(ZR::Snapshot::none, "ComputerSystem", "BMC");
     builder.add(builder.add(bmc, "Network", "Network"), "NetworkInterface", "Ethernet");
     builder.property(Properties::Name, std::string("eth0"));
     builder.add(ZR::Snapshot::none, "NetworkInterface", "alone");
-    EXPECT_EQ(interfacesOf(*builder.build()),
-              (std::vector<InterfaceOverview>{
-                  {"Computer", "eth0", std::nullopt, "active", "192.0.2.17", {}, ""},
-                  {"Computer", "eth1", std::nullopt, "inactive", "", {}, ""},
-                  {"Computer", "", std::nullopt, "", "", {}, ""},
-                  {"BMC", "eth0", std::nullopt, "", "", {}, ""},
-                  {"Computer", "", std::nullopt, "", "", {}, ""}}));
+
+    std::vector<InterfaceOverview> expected{
+        named(hostSystem, "eth0"), named(hostSystem, "eth1"), named(hostSystem, ""),
+        named(serviceProcessorSystem, "eth0"), named(hostSystem, "")};
+    for (InterfaceOverview& each : expected) {
+        each.address = "";
+        each.leases.emplace();
+    }
+    expected[0].dhcp = true;
+    expected[0].active = true;
+    expected[0].addressSource = 1;
+    expected[0].address = "192.0.2.17";
+    expected[1].dhcp = false;
+    expected[1].active = false;
+    EXPECT_EQ(interfacesOf(*builder.build()), expected);
 }
+
+/// A tree with interfaces eth0 and eth1, the second with leases.
+class LeasesOfATree : public ::testing::Test {
+  protected:
+    LeasesOfATree() {
+        const auto network = builder_.add(ZR::Snapshot::none, "Network", "Network");
+        builder_.add(network, "NetworkInterface", "Ethernet");
+        builder_.property(Properties::Name, std::string("eth0"));
+        interface_ = builder_.add(network, "NetworkInterface", "Ethernet");
+        builder_.property(Properties::Name, std::string("eth1"));
+    }
+    void addLease() { builder_.add(interface_, "DHCPLease", "DHCP lease"); }
+    std::vector<LeaseOverview> leases() {
+        auto interfaces = interfacesOf(*builder_.build());
+        EXPECT_TRUE(interfaces[0].leases->empty());
+        return *std::move(interfaces[1].leases);
+    }
+
+    ZR::SnapshotBuilder builder_;
+    ZR::Snapshot::Index interface_ = ZR::Snapshot::none;
+};
+
+TEST_F(LeasesOfATree, HaveAllThatTheirNodesHave) {
+    addLease();
+    builder_.property(Properties::Family, std::string("IPv6"));
+    builder_.property(Properties::ClientState, std::uint64_t{8});
+    builder_.property(Properties::Address, std::string("2001:db8::17"));
+    builder_.property(Properties::ServerAddress, std::string("fe80::1"));
+    builder_.property(Properties::LeaseObtained, std::uint64_t{100});
+    builder_.property(Properties::RenewalTime, std::uint64_t{200});
+    builder_.property(Properties::RebindingTime, std::uint64_t{300});
+    builder_.property(Properties::LeaseExpires, std::uint64_t{400});
+    builder_.property(Properties::OptionsReceived, std::vector<std::uint64_t>{23, 24});
+    builder_.property(Properties::ClientIdentifier, std::string("00:01"));
+    builder_.property(Properties::Client, std::string("dhclient"));
+    builder_.property(Properties::Process, std::uint64_t{17});
+    builder_.property(Properties::Source, std::string("/var/lib/dhcp/dhclient6.leases"));
+    addLease();
+    LeaseOverview full;
+    full.family = "IPv6";
+    full.clientState = 8;
+    full.address = "2001:db8::17";
+    full.server = "fe80::1";
+    full.obtained = 100;
+    full.renews = 200;
+    full.rebinds = 300;
+    full.expires = 400;
+    full.options = {23, 24};
+    full.clientIdentifier = "00:01";
+    full.client = "dhclient";
+    full.process = 17;
+    full.source = "/var/lib/dhcp/dhclient6.leases";
+    EXPECT_EQ(leases(), (std::vector<LeaseOverview>{full, LeaseOverview{}}));
+}
+
+TEST_F(LeasesOfATree, HaveNoTimesBeyondTheLast) {
+    addLease();
+    builder_.property(Properties::LeaseExpires, std::uint64_t{UINT64_MAX});
+    EXPECT_EQ(leases()[0].expires, static_cast<std::int64_t>(ZR::NodeLexicon::never));
+}
+
+TEST_F(LeasesOfATree, KnowThatTheirClientIsGone) {
+    using ZR::Diagnostic;
+    addLease();
+    builder_.diagnostic(Diagnostic("eth1: dhclient does not run", Diagnostic::Kind::ClientGone));
+    EXPECT_TRUE(leases()[0].clientGone);
+}
+
+TEST_F(LeasesOfATree, WhoseClientRunsAreNotThoseOfOneThatIsGone) {
+    using ZR::Diagnostic;
+    addLease();
+    builder_.property(Properties::Process, std::uint64_t{17});
+    builder_.diagnostic(Diagnostic("eth1: dhclient does not run", Diagnostic::Kind::ClientGone));
+    builder_.diagnostic(Diagnostic("eth1: something else", Diagnostic::Kind::Note));
+    EXPECT_FALSE(leases()[0].clientGone);
+}
+
+class MachineInterfacesServed : public ::testing::Test {
+  protected:
+    MachineInterfacesServed() {
+        interfaces_[0].address = "192.0.2.17";
+        interfaces_[1].address = "";
+    }
+
+    std::vector<InterfaceOverview> with(const ServedInstances& served) const {
+        auto interfaces = interfaces_;
+        addServed(served, interfaces);
+        return interfaces;
+    }
+
+    std::vector<InterfaceOverview> interfaces_{named(hostSystem, "eth0"),
+                                               named(hostSystem, "eth0_1"),
+                                               named(serviceProcessorSystem, "eth0")};
+};
 
 TEST_F(MachineInterfacesServed, StaysAsItIsWhenNothingIsServed) {
     EXPECT_EQ(with({}), interfaces_);
@@ -131,30 +221,47 @@ TEST_F(MachineInterfacesServed, HasDhcpOffWithoutAnEndpoint) {
     for (const InterfaceOverview& each : with(served)) {
         EXPECT_EQ(each.dhcp, false);
     }
-    EXPECT_EQ(with(served)[0].state, "active");
+}
+
+TEST_F(MachineInterfacesServed, KeepsWhatATreeTellsOfDhcp) {
+    interfaces_[0].leases.emplace();
+    interfaces_[1].leases.emplace();
+    interfaces_[1].dhcp = true;
+    ServedInstances served;
+    served.endpoints.emplace();
+    EXPECT_EQ(with(served)[0].dhcp, std::nullopt);
+    EXPECT_EQ(with(served)[1].dhcp, true);
 }
 
 TEST_F(MachineInterfacesServed, TakesTheStateOfTheClient) {
     ServedInstances served;
-    served.endpoints = {endpoint(host, "eth0", 2, 8), endpoint(host, "eth0_1", 3, 0),
-                        endpoint(processor, "eth0", 2, 99)};
+    served.endpoints = {endpoint(host, "eth0", 8), endpoint(processor, "eth0", 99)};
     const auto interfaces = with(served);
     EXPECT_EQ(interfaces[0].dhcp, true);
-    EXPECT_EQ(interfaces[0].state, "bound");
-    EXPECT_EQ(interfaces[1].state, "disabled");
-    EXPECT_EQ(interfaces[2].state, "99");
+    EXPECT_EQ(interfaces[0].clientState, 8U);
+    EXPECT_EQ(interfaces[1].clientState, std::nullopt);
+    EXPECT_EQ(interfaces[2].clientState, 99U);
 }
 
 TEST_F(MachineInterfacesServed, TellsInterfacesOfOneNameApartByTheirSystem) {
     ServedInstances served;
-    served.endpoints = {endpoint(processor, "eth0", 2, 8)};
+    served.endpoints = {endpoint(processor, "eth0", 8)};
     served.accessPoints = {accessPoint(processor, "eth0_IPv4", "192.0.2.1")};
     served.settings = {setting("BMC%eth0", "management"), setting("Computer%eth0", "office")};
     const auto interfaces = with(served);
-    EXPECT_EQ(interfaces[0],
-              (InterfaceOverview{"Computer", "eth0", false, "active", "192.0.2.17", {}, "office"}));
-    EXPECT_EQ(interfaces[2],
-              (InterfaceOverview{"BMC", "eth0", true, "bound", "", {"192.0.2.1"}, "management"}));
+    InterfaceOverview ofHost = interfaces_[0];
+    ofHost.dhcp = false;
+    ofHost.servers.emplace();
+    ofHost.configurationName = "office";
+    InterfaceOverview ofProcessor = interfaces_[2];
+    ofProcessor.dhcp = true;
+    ofProcessor.clientState = 8;
+    ofProcessor.servers = {"192.0.2.1"};
+    ofProcessor.configurationName = "management";
+    EXPECT_EQ(interfaces[0], ofHost);
+    EXPECT_EQ(interfaces[2], ofProcessor);
+    // A setting that is missing is known to have no name.
+    EXPECT_EQ(interfaces[1].configurationName, "");
 }
 
 TEST_F(MachineInterfacesServed, FindsServersByTheWholeNameOfTheInterface) {
@@ -165,7 +272,7 @@ TEST_F(MachineInterfacesServed, FindsServersByTheWholeNameOfTheInterface) {
     const auto interfaces = with(served);
     EXPECT_EQ(interfaces[0].servers, (std::vector<std::string>{"192.0.2.1", "2001:db8::1"}));
     EXPECT_EQ(interfaces[1].servers, (std::vector<std::string>{"192.0.2.9"}));
-    EXPECT_TRUE(interfaces[2].servers.empty());
+    EXPECT_TRUE(interfaces[2].servers->empty());
 }
 
 }  // namespace

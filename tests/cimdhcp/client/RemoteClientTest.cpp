@@ -1,10 +1,12 @@
 // What servers of any kind may send; program/RemoteTest.cpp asks the real one.
+#include "cimom/ClassDeclaration.h"
 #include "client/RemoteClient.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
 #include "cimom/ObjectPathText.h"
+#include "client/Response.h"
 #include "kit/RawServer.h"
 
 namespace cimdhcp {

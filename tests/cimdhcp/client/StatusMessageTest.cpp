@@ -3,6 +3,8 @@
 #include <gtest/gtest.h>
 
 #include "cimom/ObjectPathText.h"
+#include "cimom/Status.h"
+#include "client/Response.h"
 
 namespace cimdhcp {
 namespace {

@@ -83,6 +83,31 @@ TEST_F(FleetText, ListsFailuresAtTheEndInTheOrderOfTheServers) {
     EXPECT_EQ(err_.str(), "cimdhcp: 2 of 3 servers failed:\n  http://a: dead\n  c: late\n");
 }
 
+TEST_F(FleetText, TellsLikeDiagnosticsOnceAtTheEnd) {
+    const auto with = [](std::size_t server, const std::string& diagnostics) {
+        ServerReport report = good(server, "x\n");
+        report.outcome.diagnostics = diagnostics;
+        return report;
+    };
+    FleetOutput shown = output({});
+    shown.show(with(2, "cimdhcp: note: one\ncimdhcp: note: two\n"));
+    shown.show(with(0, "cimdhcp: note: two\n"));
+    EXPECT_EQ(err_.str(), "");
+    EXPECT_EQ(shown.finish(false), ExitStatus::ok);
+    EXPECT_EQ(err_.str(), "c: cimdhcp: note: one\nc, http://a: cimdhcp: note: two\n");
+}
+
+TEST_F(FleetText, CountsTheServersOfADiagnosticThatManyHave) {
+    FleetOutput shown = output({});
+    for (int count = 0; count < 5; ++count) {
+        ServerReport report = good(0, "x\n");
+        report.outcome.diagnostics = "cimdhcp: note: one\n";
+        shown.show(std::move(report));
+    }
+    EXPECT_EQ(shown.finish(false), ExitStatus::ok);
+    EXPECT_EQ(err_.str(), "5 servers: cimdhcp: note: one\n");
+}
+
 TEST_F(FleetText, TellsHowFarItGotWhenItIsInterrupted) {
     FleetOutput shown = output({});
     shown.show(good(1, "x\n"));

@@ -4,6 +4,8 @@
 
 #include <memory>
 
+#include "cimom/Instance.h"
+
 namespace {
 
 using cimdhcp::connect;

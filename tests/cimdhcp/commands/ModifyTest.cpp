@@ -2,6 +2,11 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include "arguments/Commands.h"
+#include "cimom/ClassDeclaration.h"
+#include "client/ClassLookup.h"
+#include "client/Client.h"
+#include "client/MachineInterfaces.h"
 #include "commands/CimOperations.h"
 #include "text/Failure.h"
 

@@ -6,7 +6,10 @@
 #include <memory>
 #include <nlohmann/json.hpp>
 
+#include "cimom/Instance.h"
 #include "cimom/ObjectPathText.h"
+#include "cimom/Status.h"
+#include "client/Response.h"
 
 namespace cimdhcp {
 namespace {

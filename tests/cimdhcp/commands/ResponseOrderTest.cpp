@@ -3,6 +3,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include "client/Response.h"
 #include "text/Failure.h"
 
 namespace cimdhcp {

@@ -2,7 +2,9 @@
 
 #include <gtest/gtest.h>
 
+#include "cimom/Instance.h"
 #include "cimom/ObjectPathText.h"
+#include "client/Response.h"
 #include "kit/SmallSchema.h"
 
 namespace cimdhcp {

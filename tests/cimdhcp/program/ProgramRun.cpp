@@ -210,7 +210,12 @@ const char* const twoInterfaces = R"(
                           "AddressSource": 1, "InterfaceState": 1,
                           "DHCPServerAddresses": ["192.0.2.1", "2001:db8::1"],
                           "IPv4Address": "192.0.2.17" },
-          "readOnly": ["Name"] },
+          "readOnly": ["Name"],
+          "children": [
+            { "type": "DHCPLease", "description": "DHCP lease",
+              "properties": { "Family": "IPv4", "ClientState": 8, "Address": "192.0.2.17",
+                              "ServerAddress": "192.0.2.1", "LeaseExpires": 253402300799,
+                              "Client": "dhclient" } } ] },
         { "type": "NetworkInterface", "description": "Ethernet interface",
           "properties": { "Name": "eth1", "DHCPEnabled": false, "AddressSource": 3,
                           "InterfaceState": 1, "IPv4Address": "198.51.100.4" } } ] } ] },

@@ -67,7 +67,7 @@ class ProgramTest : public ::testing::Test {
     ZR::Testing::TemporaryDirectory directory_;
 };
 
-/// A host with eth0 (DHCP, bound, two servers) and eth1 (a fixed address), and a
+/// A host with eth0 (DHCP, a lease without an end, two servers) and eth1 (a fixed address), and a
 /// service processor without interfaces.
 extern const char* const twoInterfaces;
 

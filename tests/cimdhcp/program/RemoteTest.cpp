@@ -133,32 +133,109 @@ TEST_F(Remote, EveryInstanceIsAsOnTheMachineItself) {
     expectSame({"get", "QVXZR_DHCPProtocolEndpoint.Name=\"eth0\""});
 }
 
-TEST_F(Remote, TheMachineIsShownAsOnItself) {
+constexpr const char* notTold = "cimdhcp: note: the server does not tell CLIENT and EXPIRES\n";
+
+TEST_F(Remote, TheMachineIsShownAsFarAsItsClassesTell) {
     writeConfiguration("eth0", "CONFIG_NAME=office\n");
     setTree(test::computer("Computer", test::dhcpInterface("eth0", "192.0.2.1") + "," +
                                            test::dhcpInterface("eth10", "192.0.2.2") + "," +
                                            test::dhcpInterface("eth9", "2001:db8::1")) +
             "," + test::computer("BMC", test::dhcpInterface("eth0", "192.0.2.9")));
     serve();
-    expectSame({"show"});
-    expectSame({"--format", "json", "show"});
-    expectSame({"show", "--sort", "interface"});
-    expectSame({"show", "--sort", "system", "--no-header"});
+    EXPECT_EQ(ask({"show", "--sort", "interface"}),
+              (Ended{0,
+                     "SYSTEM    INTERFACE  DHCP  STATE  CLIENT  ADDRESS  EXPIRES  SERVERS      "
+                     "CONFIGURATION NAME\n"
+                     "Computer  eth0       on    bound  ?       -        ?        192.0.2.1    "
+                     "office\n"
+                     "BMC       eth0       on    bound  ?       -        ?        192.0.2.9    "
+                     "office\n"
+                     "Computer  eth9       on    bound  ?       -        ?        2001:db8::1  -\n"
+                     "Computer  eth10      on    bound  ?       -        ?        192.0.2.2    -\n",
+                     notTold}));
+    EXPECT_EQ(linesOf(ask({"show", "--sort", "system", "--no-header"}).out).front(),
+              "BMC       eth0   on  bound  ?  -  ?  192.0.2.9    office");
+    EXPECT_THAT(ask({"--color", "always", "show"}).out, StartsWith("\x1B[1mSYSTEM"));
     expectSame({"show", "--count"});
     expectSame({"--format", "json", "show", "--count"});
-    expectSame({"--color", "always", "show"});
     expectSame({"show", "--sort", "size"});
 }
 
-TEST_F(Remote, OfAnInterfaceWithoutDhcpTheStateIsNotTold) {
+TEST_F(Remote, WhatNoClassTellsIsNullInJson) {
+    serve();
+    EXPECT_EQ(ask({"--format", "json", "show"}), (Ended{0, R"({
+  "interfaces": [
+    {
+      "interface": "eth0",
+      "system": "Computer",
+      "dhcp": true,
+      "state": "bound",
+      "link": null,
+      "client": null,
+      "address": "192.0.2.17",
+      "expires": null,
+      "servers": [
+        "192.0.2.1",
+        "2001:db8::1"
+      ],
+      "configurationName": null,
+      "leases": null,
+      "unknown": [
+        "client",
+        "expires",
+        "link",
+        "leases"
+      ]
+    },
+    {
+      "interface": "eth1",
+      "system": "Computer",
+      "dhcp": false,
+      "state": "off",
+      "link": null,
+      "client": null,
+      "address": "198.51.100.4",
+      "expires": null,
+      "servers": [],
+      "configurationName": null,
+      "leases": null,
+      "unknown": [
+        "link",
+        "leases"
+      ]
+    }
+  ]
+}
+)",
+                                                        notTold}));
+}
+
+TEST_F(Remote, TheStateOfAClientWithoutALeaseIsNotKnown) {
+    setTree(test::computer("Computer", R"({"type": "NetworkInterface", "description": "",
+        "properties": {"Name": "eth0", "DHCPEnabled": true, "AddressSource": 0,
+                       "InterfaceState": 1}, "children": [
+        {"type": "DHCPLease", "description": "DHCP lease",
+         "properties": {"Family": "IPv4", "ClientState": 0, "Client": "udhcpc"}}]})"));
+    serve();
+    EXPECT_EQ(
+        ask({"show"}),
+        (Ended{0,
+               "INTERFACE  DHCP  STATE  CLIENT  ADDRESS  EXPIRES  SERVERS  CONFIGURATION NAME\n"
+               "eth0       on    ?      ?       -        ?        -        -\n",
+               "cimdhcp: note: the server does not tell STATE, CLIENT and EXPIRES\n"}));
+}
+
+TEST_F(Remote, OfAnInterfaceWithoutDhcpTheStateIsOff) {
     serve();
     EXPECT_EQ(ask({"show"}),
               (Ended{0,
-                     "INTERFACE  DHCP  STATE  ADDRESS       SERVERS                 CONFIGURATION "
-                     "NAME\n"
-                     "eth0       on    bound  192.0.2.17    192.0.2.1, 2001:db8::1  -\n"
-                     "eth1       off   -      198.51.100.4  -                       -\n",
-                     ""}));
+                     "INTERFACE  DHCP  STATE  CLIENT  ADDRESS       EXPIRES  SERVERS             "
+                     "    CONFIGURATION NAME\n"
+                     "eth0       on    bound  ?       192.0.2.17    ?        192.0.2.1, "
+                     "2001:db8::1  -\n"
+                     "eth1       off   off    -       198.51.100.4  -        -                   "
+                     "    -\n",
+                     notTold}));
 }
 
 TEST_F(Remote, ClassesAreToldWithoutTheirProviders) {

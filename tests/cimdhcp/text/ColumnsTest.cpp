@@ -33,6 +33,15 @@ TEST(Columns, SortByWhatTheyShow) {
     EXPECT_THROW(sortBy("other", columns, rows), Failure);
 }
 
+TEST(Columns, SortByAKeyOfTheirOwn) {
+    const std::vector<Column<Row>> keyed{{"SIZE",
+                                          [](const Row& /*row*/) { return std::string("much"); },
+                                          [](const Row& row) { return std::to_string(row.size); }}};
+    std::vector<Row> rows{{"b", 10}, {"a", 9}};
+    sortBy("SIZE", keyed, rows);
+    EXPECT_EQ(rows.front().name, "a");
+}
+
 TEST(ColumnName, MayBeWrittenAsOptionsAre) {
     const std::vector<std::string> names{"STATE", "CONFIGURATION NAME"};
     EXPECT_EQ(columnNamed("state", names), 0U);

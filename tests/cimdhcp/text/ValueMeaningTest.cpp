@@ -4,6 +4,7 @@
 
 #include <memory>
 
+#include "cimom/ClassDeclaration.h"
 #include "cimom/ObjectPathText.h"
 #include "kit/SmallSchema.h"
 

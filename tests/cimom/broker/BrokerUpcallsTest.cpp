@@ -1,5 +1,6 @@
 #include <map>
 
+#include "cimom/Results.h"
 #include "kit/TestManager.h"
 
 namespace cimom::test {

@@ -2,6 +2,9 @@
 
 #include <limits>
 
+#include "broker/objects/BrokerInstance.h"
+#include "broker/objects/BrokerObjectPath.h"
+#include "cimom/Instance.h"
 #include "kit/BrokerFixture.h"
 
 namespace cimom::test {

@@ -1,5 +1,7 @@
 #include "kit/TestManager.h"
 
+#include "cimom/Results.h"
+
 namespace cimom::test {
 namespace {
 

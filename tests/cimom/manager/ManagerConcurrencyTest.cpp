@@ -1,6 +1,7 @@
 #include <atomic>
 #include <thread>
 
+#include "cimom/Results.h"
 #include "kit/TestManager.h"
 
 namespace cimom::test {

@@ -2,6 +2,8 @@
 
 #include <gtest/gtest.h>
 
+#include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
 #include "cimom/ObjectPathText.h"
 
 namespace cimom {

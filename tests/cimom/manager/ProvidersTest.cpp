@@ -4,6 +4,8 @@
 
 #include <fstream>
 
+#include "cimom/ClassRepository.h"
+#include "cimom/Results.h"
 #include "kit/TestManager.h"
 
 namespace cimom::test {

@@ -1,5 +1,7 @@
 #include "manager/RequestPath.h"
 
+#include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
 #include "kit/TestManager.h"
 
 namespace cimom {

@@ -6,6 +6,9 @@
 #include <fstream>
 #include <random>
 
+#include "cimom/ClassDeclaration.h"
+#include "cimom/MofError.h"
+
 namespace cimom {
 namespace {
 

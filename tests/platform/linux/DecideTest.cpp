@@ -11,6 +11,7 @@
 #include <map>
 
 #include "LinuxSupport.h"
+#include "kit/Diagnostics.h"
 
 namespace ZR::Live {
 namespace {
@@ -101,16 +102,28 @@ class DecideTest : public testing::Test {
     [[nodiscard]] PropertyValue enabled() const { return value(Properties::DHCPEnabled); }
     [[nodiscard]] PropertyValue servers() const { return value(Properties::DHCPServerAddresses); }
     [[nodiscard]] PropertyValue ipv4() const { return value(Properties::IPv4Address); }
+    [[nodiscard]] std::vector<std::string> diagnostics() const {
+        const auto tree = decide(facts_, now);
+        return ZR::Testing::textsOf(tree->diagnostics());
+    }
+    [[nodiscard]] std::vector<Diagnostic::Kind> kinds() const {
+        std::vector<Diagnostic::Kind> kinds;
+        const auto tree = decide(facts_, now);
+        for (const Diagnostic& diagnostic : tree->diagnostics()) {
+            kinds.push_back(diagnostic.kind);
+        }
+        return kinds;
+    }
 
     MachineFacts facts_;
 };
 
 TEST_F(DecideTest, TheTreeIsAComputerWithANetworkWithItsInterfaces) {
     address(leased, 600, 0);
-    lease();
+    lease().clientAlive = true;
     process();
     const auto tree = decide(facts_, now);
-    ASSERT_EQ(tree->nodes().size(), 3U);
+    ASSERT_EQ(tree->nodes().size(), 4U) << "the last is a lease";
     EXPECT_EQ(tree->node(0).type, "ComputerSystem");
     EXPECT_EQ(tree->node(0).description, "Computer");
     EXPECT_EQ(tree->node(0).parent, Snapshot::none);
@@ -221,11 +234,37 @@ TEST_F(DecideTest, ALeaseIsLiveOnlyWithItsAddressOnItsLink) {
 }
 
 TEST_F(DecideTest, AnExpiredLeaseIsNotLive) {
-    address(leased);
+    address(leased, 1, 0);
     lease().expires = now;
     EXPECT_EQ(servers(), PropertyValue{Servers{}});
     facts_.clients.leases.back().expires = now + 1;
     EXPECT_EQ(servers(), PropertyValue{Servers{server}});
+}
+
+TEST_F(DecideTest, ALeaseWithAnEndIsNotThatOfAnAddressWithoutOne) {
+    address(leased);
+    lease();
+    EXPECT_EQ(servers(), PropertyValue{Servers{}}) << "set by hand";
+    EXPECT_EQ(source(), number(3));
+    EXPECT_EQ(enabled(), PropertyValue{false});
+    for (const Client client : {Client::Udhcpc, Client::Ipconfig, Client::Connman}) {
+        facts_.clients.leases.back().client = client;
+        EXPECT_EQ(servers(), PropertyValue{Servers{server}}) << nameOf(client);
+        EXPECT_EQ(source(), number(1)) << nameOf(client);
+        EXPECT_EQ(enabled(), PropertyValue{true}) << nameOf(client);
+    }
+    facts_.clients.leases.back().client = Client::Dhclient;
+    facts_.clients.leases.back().bootp = true;
+    EXPECT_EQ(source(), number(2)) << "BOOTP knows no ends";
+}
+
+TEST_F(DecideTest, AClientThatRunsDoesNotMakeAnAddressWithoutAnEndItsOwn) {
+    address(leased);
+    lease().clientAlive = true;
+    process();
+    EXPECT_EQ(servers(), PropertyValue{Servers{}});
+    EXPECT_EQ(enabled(), PropertyValue{true}) << "it asks";
+    EXPECT_EQ(source(), number(0));
 }
 
 TEST_F(DecideTest, ALeaseWithoutAnEndIsLive) {
@@ -233,7 +272,30 @@ TEST_F(DecideTest, ALeaseWithoutAnEndIsLive) {
     lease().expires = Lease::never;
     EXPECT_EQ(servers(), PropertyValue{Servers{server}});
     facts_.clients.leases.back().expires = std::nullopt;
+    EXPECT_EQ(servers(), PropertyValue{Servers{}}) << "the client would take it back";
+    facts_.clients.leases.back().clientAlive = true;
     EXPECT_EQ(servers(), PropertyValue{Servers{server}});
+}
+
+TEST_F(DecideTest, AnEnd136YearsHenceIsNone) {
+    address(leased);
+    lease().expires = now + UINT32_MAX;
+    EXPECT_EQ(servers(), PropertyValue{Servers{server}});
+}
+
+TEST_F(DecideTest, AfterTheClockWasSetTheKernelTellsHowLongALeaseLasts) {
+    constexpr std::int64_t years = std::int64_t{5} * 365 * 24 * 3600;
+    address(leased, 600, 0);
+    lease().clientAlive = true;
+    for (const std::int64_t by : {-years, years}) {
+        facts_.clients.leases.back().expires = now + 600 + by;
+        EXPECT_EQ(servers(), PropertyValue{Servers{server}}) << by;
+        EXPECT_EQ(Machine(facts_, now).changesAt(), now + 600) << by;
+    }
+    facts_.clients.leases.back().clientAlive = false;
+    EXPECT_EQ(servers(), PropertyValue{Servers{server}});
+    facts_.clients.leases.back().expires = now - years;
+    EXPECT_EQ(servers(), PropertyValue{Servers{}}) << "of an earlier year";
 }
 
 TEST_F(DecideTest, AReleasedLeaseIsNotLive) {
@@ -344,11 +406,46 @@ TEST_F(DecideTest, TheManagersConfigurationDecides) {
     EXPECT_EQ(enabled(), PropertyValue{true});
 }
 
-TEST_F(DecideTest, TheManagersWordStandsAboveClientsAndKernel) {
+TEST_F(DecideTest, AManagementMayNameItsLink) {
+    management(true).ifindex = 0;
+    facts_.clients.managements.back().interfaceName = "eth0"_name;
+    EXPECT_EQ(enabled(), PropertyValue{true});
+    facts_.clients.managements.back().interfaceName = "eth9"_name;
+    EXPECT_EQ(enabled(), PropertyValue{false});
+}
+
+TEST_F(DecideTest, OfTwoManagersTheOneThatUsesDhcpCounts) {
+    management(true);
+    management(false).client = Client::NetworkManager;
+    EXPECT_EQ(enabled(), PropertyValue{true});
+    std::swap(facts_.clients.managements[0], facts_.clients.managements[1]);
+    EXPECT_EQ(enabled(), PropertyValue{true});
+}
+
+TEST_F(DecideTest, TheManagersWordStandsAboveALifetime) {
     management(false);
-    process();
     address(leased, 600, 0);
     EXPECT_EQ(enabled(), PropertyValue{false});
+}
+
+TEST_F(DecideTest, AClientThatWasStartedBesideTheManagerHasTheLinkAllTheSame) {
+    management(false);
+    process();
+    EXPECT_EQ(enabled(), PropertyValue{true});
+}
+
+TEST_F(DecideTest, TheWordOfAClientItselfStandsAboveItsProcess) {
+    process().client = Client::Dhcpcd;
+    management(false).client = Client::Dhcpcd;
+    EXPECT_EQ(enabled(), PropertyValue{false}) << "it was told a static address";
+    facts_.clients.managements.back().dhcp4 = std::nullopt;
+    EXPECT_EQ(enabled(), PropertyValue{true});
+    facts_.clients.managements.back() = {.client = Client::Dhcpcd,
+                                         .interfaceName = "eth1"_name,
+                                         .dhcp4 = false,
+                                         .dhcp6 = {},
+                                         .staticAddresses = {}};
+    EXPECT_EQ(enabled(), PropertyValue{true}) << "it speaks of another link";
 }
 
 TEST_F(DecideTest, TheManagersLeaseStandsAboveItsConfiguration) {
@@ -378,16 +475,96 @@ TEST_F(DecideTest, AClientOfEitherProtocolOnTheLinkEnables) {
     EXPECT_EQ(enabled(), PropertyValue{false});
 }
 
-TEST_F(DecideTest, AClientOfAllLinksRunsOnThoseThatCanBroadcast) {
+TEST_F(DecideTest, AClientOfAllLinksHasThoseThatItHears) {
     process().interfaces = {};
-    EXPECT_EQ(enabled(), PropertyValue{true});
-    link().flags = IFF_UP;
+    facts_.clients.processes.back().heardLinks = {index + 1};
     EXPECT_EQ(enabled(), PropertyValue{false});
+    facts_.clients.processes.back().heardLinks = {index};
+    EXPECT_EQ(enabled(), PropertyValue{true});
+    facts_.clients.processes.back().heardLinks.reset();
+    EXPECT_EQ(enabled(), PropertyValue{false});
+    facts_.clients.sockets.packetLinks = {index};
+    EXPECT_EQ(enabled(), PropertyValue{true}) << "whose sockets they are is not to be known";
 }
 
-TEST_F(DecideTest, AnIPv4AddressWithAnEndEnables) {
+TEST_F(DecideTest, AClientOfAllLinksHasThoseOfWhichItHoldsALease) {
+    process(true).interfaces = {};
+    address("2001:db8::7", 600, 0);
+    lease("2001:db8::7", "");
+    EXPECT_EQ(Machine(facts_, now).interfaces()[0].processes.size(), 0U) << "of an earlier client";
+    facts_.clients.leases.back().clientAlive = true;
+    EXPECT_EQ(Machine(facts_, now).interfaces()[0].processes.size(), 1U);
+    facts_.clients.processes.back().ipv6 = false;
+    EXPECT_EQ(Machine(facts_, now).interfaces()[0].processes.size(), 0U);
+}
+
+TEST_F(DecideTest, AClientKeepsItsLinkWhenThatIsRenamed) {
+    process().heardLinks = {index};
+    link().name = "lan0"_name;
+    EXPECT_EQ(value(Properties::DHCPEnabled, "lan0"), PropertyValue{true});
+    Link other = link();
+    other.ifindex = 7;
+    other.name = "eth0"_name;
+    facts_.links.push_back(other);
+    EXPECT_EQ(enabled(), PropertyValue{false}) << "which has its name now";
+    EXPECT_EQ(value(Properties::DHCPEnabled, "lan0"), PropertyValue{true});
+}
+
+TEST_F(DecideTest, AClientThatHearsFewerLinksThanItWasToldHasThoseAsWell) {
+    process().interfaces = {"eth0"_name, "eth1"_name};
+    facts_.clients.processes.back().heardLinks.emplace();
+    EXPECT_EQ(enabled(), PropertyValue{true}) << "bound, it needs no socket";
+}
+
+TEST_F(DecideTest, WhetherAnAddressWithAnEndIsFromDhcpIsNotKnownWithoutAClient) {
+    address(leased, 600, 0);
+    EXPECT_EQ(enabled(), PropertyValue{});
+    EXPECT_EQ(source(), number(0));
+    EXPECT_THAT(diagnostics(), ElementsAre(testing::HasSubstr("eth0: 198.51.100.7 has an end")));
+    process();
+    EXPECT_EQ(enabled(), PropertyValue{true});
+    EXPECT_EQ(source(), number(1));
+    EXPECT_THAT(diagnostics(), IsEmpty());
+}
+
+// --- what this user may not see
+
+TEST_F(DecideTest, WhereClientsAreHiddenNothingIsSaidOfDhcp) {
+    facts_.clients.processesHidden = true;
+    address(leased);
+    configuration(true);
+    lease().expires = now - 1;
+    EXPECT_EQ(enabled(), PropertyValue{});
+    EXPECT_EQ(source(), number(0));
+    management(false);
+    EXPECT_EQ(enabled(), PropertyValue{}) << "another client may run besides";
+    EXPECT_THAT(diagnostics(), IsEmpty()) << "one may run";
+}
+
+TEST_F(DecideTest, WhereClientsAreHiddenOtherEvidenceSaysOn) {
+    facts_.clients.processesHidden = true;
     address(leased, 600, 0);
     EXPECT_EQ(enabled(), PropertyValue{true});
+    EXPECT_EQ(source(), number(1));
+    facts_.addresses.clear();
+    facts_.clients.sockets.bound = {{.address = {}, .peer = {}}};
+    facts_.clients.sockets.packetLinks = {index};
+    EXPECT_EQ(enabled(), PropertyValue{true});
+    facts_.clients.sockets = {};
+    management(true);
+    EXPECT_EQ(enabled(), PropertyValue{true});
+}
+
+TEST_F(DecideTest, AHiddenClientHidesTheLinksThatItWasToldAlone) {
+    process();
+    facts_.clients.hiddenClients.swap(facts_.clients.processes);
+    EXPECT_EQ(enabled(), PropertyValue{});
+    facts_.clients.hiddenClients.back().interfaces = {"eth1"_name};
+    EXPECT_EQ(enabled(), PropertyValue{false});
+    facts_.clients.hiddenClients.back().interfaces = {};
+    EXPECT_EQ(enabled(), PropertyValue{});
+    link().flags = IFF_UP;
+    EXPECT_EQ(enabled(), PropertyValue{false}) << "it cannot broadcast";
 }
 
 TEST_F(DecideTest, AnIPv6AddressWithAnEndEnablesNothing) {
@@ -398,7 +575,7 @@ TEST_F(DecideTest, AnIPv6AddressWithAnEndEnablesNothing) {
 // --- AddressSource
 
 TEST_F(DecideTest, ALiveLeaseOfTheAddressIsDhcpOrBootp) {
-    address(leased);
+    address(leased, 600, 0);
     lease();
     EXPECT_EQ(source(), number(1));
     facts_.clients.leases.back().bootp = true;
@@ -419,11 +596,6 @@ TEST_F(DecideTest, LinkScopeIn169254IsLinkLocal) {
     facts_.addresses.back().ip = "169.254.3.4"_ip;
     facts_.addresses.back().scope = RT_SCOPE_UNIVERSE;
     EXPECT_EQ(source(), number(3));
-}
-
-TEST_F(DecideTest, AnAddressWithAnEndIsFromDhcp) {
-    address(leased, 600, 0);
-    EXPECT_EQ(source(), number(1));
 }
 
 TEST_F(DecideTest, APermanentAddressWithoutAClientIsStatic) {
@@ -447,17 +619,34 @@ TEST_F(DecideTest, PermanentDoesNotMeanStaticWhereTheManagerUsesDhcp) {
     EXPECT_EQ(source(), number(3));
 }
 
-TEST_F(DecideTest, WithoutAnAddressTheIntentCounts) {
+TEST_F(DecideTest, WithoutAnAddressThereIsNoSourceWhoeverAsksForOne) {
     EXPECT_EQ(source(), number(0));
-    management(false).linkLocal4 = true;
-    EXPECT_EQ(source(), number(4));
-    facts_.clients.managements.back().staticAddresses = {"192.0.2.1"_ip};
-    EXPECT_EQ(source(), number(3));
-    facts_.clients.managements.back().dhcp4 = true;
-    EXPECT_EQ(source(), number(1));
-    facts_.clients.managements.clear();
+    LinkConfiguration& told = management(false);
+    told.linkLocal4 = true;
+    told.staticAddresses = {"192.0.2.1"_ip};
+    EXPECT_EQ(source(), number(0));
+    told.dhcp4 = true;
     process();
+    configuration(true);
+    EXPECT_EQ(source(), number(0));
+    EXPECT_EQ(enabled(), PropertyValue{true});
+}
+
+TEST_F(DecideTest, ADhcpv6LeaseIsASourceWithoutAnIPv4Address) {
+    address("2001:db8::7", 600, 0);
+    lease("2001:db8::7", "");
     EXPECT_EQ(source(), number(1));
+    EXPECT_EQ(enabled(), PropertyValue{true});
+    address("192.0.2.1");
+    EXPECT_EQ(source(), number(3)) << "that of the IPv4 address";
+}
+
+TEST_F(DecideTest, ALeaseOfAnAddressThatWasTakenAwayIsNoSource) {
+    lease().clientAlive = true;
+    process();
+    EXPECT_EQ(source(), number(0));
+    EXPECT_EQ(enabled(), PropertyValue{true});
+    EXPECT_EQ(servers(), PropertyValue{Servers{}});
 }
 
 TEST_F(DecideTest, AStaleLeaseGivesNoSource) {
@@ -471,71 +660,57 @@ TEST_F(DecideTest, LeaseWithoutItsClientStaysDhcpUntilTheKernelEndsIt) {
     lease();
     EXPECT_EQ(source(), number(1));
     EXPECT_EQ(servers(), PropertyValue{Servers{server}});
+    EXPECT_EQ(enabled(), PropertyValue{true}) << "a client obtained the address";
+    EXPECT_THAT(diagnostics(), ElementsAre("eth0: the client that leased 198.51.100.7 (dhclient) "
+                                           "does not run: nothing renews the lease"));
+    EXPECT_EQ(kinds(), std::vector{Diagnostic::Kind::ClientGone});
+    facts_.clients.leases.back().clientAlive = true;
+    EXPECT_THAT(diagnostics(), IsEmpty());
 }
 
 // --- what clients leave besides leases
 
-TEST_F(DecideTest, AConfigurationSpeaksWhereNoManagerDoes) {
-    configuration(true);
-    EXPECT_EQ(enabled(), PropertyValue{true});
-    EXPECT_EQ(source(), number(1));
-    management(false);
-    EXPECT_EQ(enabled(), PropertyValue{false});
-    EXPECT_EQ(source(), number(0));
-    facts_.clients.managements.back().dhcp4 = std::nullopt;
-    EXPECT_EQ(enabled(), PropertyValue{true});
-    EXPECT_EQ(source(), number(1));
-}
-
-TEST_F(DecideTest, AConfigurationWithoutDhcpSpeaksLouderThanALifetime) {
-    address(leased, 600, 0);
-    configuration(false);
-    EXPECT_EQ(enabled(), PropertyValue{false});
-    facts_.clients.configurations.back().dhcp6 = true;
-    EXPECT_EQ(enabled(), PropertyValue{true});
-    facts_.clients.configurations.back() = {.client = Client::Ifcfg,
-                                            .interfaceName = "eth0"_name,
-                                            .dhcp4 = {},
-                                            .dhcp6 = {},
-                                            .staticAddresses = {}};
-    EXPECT_EQ(enabled(), PropertyValue{true}) << "it does not tell, but the lifetime does";
-}
-
-TEST_F(DecideTest, AClientSpeaksLouderThanAConfiguration) {
-    configuration(false);
-    process();
-    EXPECT_EQ(enabled(), PropertyValue{true});
-}
-
-TEST_F(DecideTest, APermanentAddressIsWhatItsConfigurationSays) {
+TEST_F(DecideTest, AConfigurationThatNothingExecutesIsNotAFact) {
+    configuration(true).origin = "/etc/network/interfaces";
     address(leased);
-    LinkConfiguration& told = configuration(true);
-    EXPECT_EQ(source(), number(1));
-    told.staticAddresses = {ipAddress(leased)};
-    EXPECT_EQ(source(), number(3)) << "a further address that was told";
-    told.staticAddresses.clear();
-    told.dhcp4 = false;
+    EXPECT_EQ(enabled(), PropertyValue{false});
     EXPECT_EQ(source(), number(3));
-    told.bootp4 = true;
-    EXPECT_EQ(source(), number(2));
-    told.bootp4 = false;
-    told.other4 = true;
-    EXPECT_EQ(source(), number(5));
+    EXPECT_THAT(diagnostics(),
+                ElementsAre("eth0: /etc/network/interfaces asks for DHCP, and no client runs"));
+    EXPECT_EQ(kinds(), std::vector{Diagnostic::Kind::NotApplied});
+    facts_.addresses.clear();
+    EXPECT_EQ(enabled(), PropertyValue{false});
+    EXPECT_EQ(source(), number(0));
+    process();
+    EXPECT_THAT(diagnostics(), IsEmpty()) << "it is executed";
 }
 
-TEST_F(DecideTest, WithoutAnAddressTheConfigurationIsTheIntent) {
-    LinkConfiguration& told = configuration(false);
-    EXPECT_EQ(source(), number(0));
-    told.other4 = true;
-    EXPECT_EQ(source(), number(5));
-    told.linkLocal4 = true;
-    EXPECT_EQ(source(), number(4));
-    told.staticAddresses = {ipAddress(leased)};
-    EXPECT_EQ(source(), number(3));
-    told.bootp4 = true;
-    EXPECT_EQ(source(), number(2));
-    told.dhcp4 = true;
+TEST_F(DecideTest, WhatAManagerDoesNotUseOfItsOwnFilesIsNotTold) {
+    configuration(true).client = Client::NetworkManager;
+    management(false).client = Client::NetworkManager;
+    EXPECT_THAT(diagnostics(), IsEmpty());
+    facts_.clients.managements.back().client = Client::Networkd;
+    EXPECT_THAT(diagnostics(), ElementsAre(testing::HasSubstr("NetworkManager asks for DHCP")));
+}
+
+TEST_F(DecideTest, ConfigurationsThatDoNotAskForDhcpAreNotTold) {
+    configuration(false);
+    configuration(std::nullopt);
+    EXPECT_THAT(diagnostics(), IsEmpty());
+    facts_.clients.configurations.back().bootp4 = true;
+    facts_.clients.configurations.back().origin = "ifcfg-eth0";
+    EXPECT_THAT(diagnostics(), ElementsAre(testing::HasSubstr("eth0: ifcfg-eth0 asks for DHCP")));
+}
+
+TEST_F(DecideTest, AnAddressThatTheConfigurationNamesIsStatic) {
+    address(leased, 600, 0);
+    process();
     EXPECT_EQ(source(), number(1));
+    address("192.0.2.1", Address::infinite, IFA_F_PERMANENT);
+    std::swap(facts_.addresses[0], facts_.addresses[1]);
+    EXPECT_EQ(source(), number(0)) << "a client runs that could have set it";
+    configuration(false).staticAddresses = {"192.0.2.1"_ip};
+    EXPECT_EQ(source(), number(3));
 }
 
 TEST_F(DecideTest, AnAddressThatTheManagerSharesIsOfAnotherKind) {
@@ -550,6 +725,10 @@ TEST_F(DecideTest, UdhcpcLeavesPermanentAddresses) {
     EXPECT_EQ(source(), number(1));
     EXPECT_EQ(enabled(), PropertyValue{true});
     EXPECT_EQ(servers(), PropertyValue{Servers{}});
+    facts_.clients.processes.back().heardLinks = {index};
+    EXPECT_EQ(source(), number(0)) << "it asks for an address, so this is not its own";
+    facts_.clients.processes.back().heardLinks.emplace();
+    EXPECT_EQ(source(), number(1));
     facts_.clients.processes.back().ipv6 = true;
     EXPECT_EQ(source(), number(3));
 }
@@ -563,15 +742,23 @@ TEST_F(DecideTest, AnAddressOfTheSystemsStartStaysWhatItWas) {
     EXPECT_EQ(source(), number(1));
     EXPECT_EQ(servers(), PropertyValue{Servers{}}) << "it may be another's by now";
     EXPECT_EQ(enabled(), PropertyValue{false}) << "no client renews it";
+    EXPECT_THAT(diagnostics(), ElementsAre("eth0: the lease of 198.51.100.7 (ipconfig) has ended, "
+                                           "and no client asks for another one"));
+    EXPECT_EQ(kinds(), std::vector{Diagnostic::Kind::LeaseEnded});
     former.bootp = true;
     EXPECT_EQ(source(), number(2));
+    former.bootp = false;
+    process();
+    EXPECT_EQ(source(), number(0)) << "a client asks anew";
+    EXPECT_THAT(diagnostics(), IsEmpty());
+    facts_.clients.processes.clear();
     address("192.0.2.1");
     facts_.addresses.erase(facts_.addresses.begin());
     EXPECT_EQ(source(), number(3));
 }
 
 TEST_F(DecideTest, ASocketAtTheAddressTellsOfAClientAndItsServer) {
-    address(leased);
+    address(leased, 600, 0);
     facts_.clients.sockets.bound = {{.address = ipAddress(leased), .peer = ipAddress(server)}};
     EXPECT_EQ(enabled(), PropertyValue{true});
     EXPECT_EQ(source(), number(1));
@@ -612,6 +799,18 @@ TEST_F(DecideTest, PortsOfBridgesAndBondsHaveNoDhcpOfTheirOwn) {
     }
 }
 
+TEST_F(DecideTest, AClientOnAPortIsTold) {
+    enslave("bridge");
+    process().pid = 17;
+    const std::string text = "eth0: dhclient, process 17 runs on a port of ";
+    EXPECT_THAT(diagnostics(), ElementsAre(text + "another link, which owns the port's addresses"));
+    EXPECT_EQ(kinds(), std::vector{Diagnostic::Kind::Note});
+    facts_.links.push_back(link());
+    facts_.links.back().ifindex = 9;
+    facts_.links.back().name = "br0"_name;
+    EXPECT_THAT(diagnostics(), ElementsAre(text + "br0, which owns the port's addresses"));
+}
+
 TEST_F(DecideTest, PortsOfAVrfKeepTheirDhcp) {
     enslave("vrf");
     address(leased, 600, 0);
@@ -628,8 +827,8 @@ TEST_F(DecideTest, ADecisionNamesItsReasonAndWhereItIsFrom) {
     const auto origins = [&] {
         const auto tree = decide(facts_, now, Explain::Yes);
         std::map<Properties, std::string> found;
-        for (const auto& property : NodeLexicon::properties) {
-            found[property.number] = tree->origin(2, property.number);
+        for (const DecisionRow& row : precedence()) {
+            found[row.property] = tree->origin(2, row.property);
         }
         return found;
     };
@@ -648,9 +847,9 @@ TEST_F(DecideTest, ADecisionNamesItsReasonAndWhereItIsFrom) {
                    "dhclient /var/lib/dhcp/dhclient.leases: the servers of the live leases"}}));
     facts_.clients.leases.clear();
     facts_.clients.processes.clear();
+    facts_.addresses.clear();
     EXPECT_EQ(origins().at(Properties::DHCPEnabled),
-              "ifcfg /etc/sysconfig/network/ifcfg-eth0: the configuration that is kept for the "
-              "link");
+              "kernel: no client has the link, and no address of it is leased");
     EXPECT_EQ(decide(facts_, now)->origin(2, Properties::Name), "") << "it was not asked for";
 }
 
@@ -672,7 +871,7 @@ TEST_F(DecideTest, TenThousandInterfacesTakeNoQuadraticTime) {
         lease(text).interfaceName = interfaceName(name);
     }
     const auto tree = decide(facts_, now);
-    EXPECT_EQ(tree->nodes().size(), 10'002U);
+    EXPECT_EQ(tree->nodes().size(), 20'002U) << "an interface and a lease each";
     EXPECT_EQ(valueOf(*tree, "eth9999", Properties::DHCPServerAddresses),
               PropertyValue{Servers{server}});
 }

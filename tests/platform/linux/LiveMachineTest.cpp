@@ -13,6 +13,7 @@
 #include "LinuxSupport.h"
 #include "ScriptedTransport.h"
 #include "StateReaders.h"
+#include "kit/Diagnostics.h"
 #include "kit/HostNameFake.h"
 #include "zrcommon/SystemName.h"
 #include "zrlinux/LiveSource.h"
@@ -47,6 +48,45 @@ class LiveMachineTest : public testing::Test {
         nlmsgerr response{};
         response.error = -error;
         return {Step{{Message{NLMSG_ERROR, 0, response}}}};
+    }
+
+    /// An address with an end.
+    static std::vector<Step> lasting(unsigned ifindex, std::array<std::uint8_t, 4> bytes,
+                                     std::uint32_t seconds) {
+        Message message = addressMessage(ifindex, bytes, 0);
+        message.number(
+            IFA_CACHEINFO,
+            ifa_cacheinfo{.ifa_prefered = seconds, .ifa_valid = seconds, .cstamp = 0, .tstamp = 0});
+        return {Step{{message, Message{NLMSG_DONE, NLM_F_MULTI, std::int32_t{0}}}}};
+    }
+    /// So many readings of one link with the same addresses.
+    static std::deque<std::vector<Step>> readings(int count, const std::vector<Step>& addresses) {
+        std::deque<std::vector<Step>> responses;
+        for (int i = 0; i < count; ++i) {
+            responses.push_back(links(1));
+            responses.push_back(addresses);
+        }
+        return responses;
+    }
+
+    void startClient() {
+        root_.write("/proc/17/comm", "udhcpc\n");
+        root_.write("/proc/17/cmdline", std::string{"udhcpc\0-i\0eth1\0", 15});
+        root_.write("/proc/17/status",
+                    "Name:\tudhcpc\nState:\tS (sleeping)\nUid:\t0\t0\t0\t0\n"
+                    "CapEff:\t000001ffffffffff\n");
+        for (const char* process : {"17", "thread-self"}) {
+            const std::string directory = root_.path("/proc/") + process + "/ns";
+            std::filesystem::create_directories(directory);
+            for (const char* space : {"net", "user"}) {
+                if (!std::filesystem::exists(
+                        std::filesystem::symlink_status(directory + '/' + space))) {
+                    std::filesystem::create_symlink(std::string{space} + ":[1]",
+                                                    directory + '/' + space);
+                }
+            }
+        }
+        root_.write("/proc/loadavg", "0.10 0.20 0.30 1/100 17\n");
     }
 
     LiveMachine& open(std::deque<std::vector<Step>> responses) {
@@ -135,8 +175,10 @@ TEST_F(LiveMachineTest, ANetworkdThatDoesNotRespondIsLeftAloneForAWhile) {
 
 TEST_F(LiveMachineTest, CapturedDhclientLeaseLivesUntilItsEnd) {
     root_.write("/var/lib/dhcp/dhclient.eth1.leases", sample("isc-dhclient/dhclient.eth1.leases"));
-    LiveMachine& machine = open(
-        {links(1), address(2, {198, 51, 100, 106}), links(1), address(2, {198, 51, 100, 106})});
+    const auto address = [](std::uint32_t seconds) {
+        return lasting(2, {198, 51, 100, 106}, seconds);
+    };
+    LiveMachine& machine = open({links(1), address(581), links(1), address(1)});
     EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),
               PropertyValue{Servers{"198.51.100.1"}});
     now_ = 1'795'216'781;
@@ -147,9 +189,9 @@ TEST_F(LiveMachineTest, CapturedDhclientLeaseLivesUntilItsEnd) {
 TEST_F(LiveMachineTest, CapturedReleaseLeavesTheOtherInterfaceItsServer) {
     root_.write("/var/lib/dhcp/dhclient.leases",
                 sample("isc-dhclient/dhclient.leases.two-interfaces-then-release-eth1"));
-    const std::vector<Step> both{
-        Step{{addressMessage(3, {198, 51, 100, 122}), addressMessage(2, {198, 51, 100, 106}),
-              Message{NLMSG_DONE, NLM_F_MULTI, std::int32_t{0}}}}};
+    std::vector<Step> both = lasting(3, {198, 51, 100, 122}, 584);
+    both[0].messages.insert(both[0].messages.begin(),
+                            lasting(2, {198, 51, 100, 106}, 500)[0].messages[0]);
     now_ = 1'795'216'234;
     const auto tree = open({links(2), both}).read();
     EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPServerAddresses), PropertyValue{Servers{}});
@@ -160,8 +202,10 @@ TEST_F(LiveMachineTest, CapturedReleaseLeavesTheOtherInterfaceItsServer) {
 TEST_F(LiveMachineTest, CapturedDhcpcdLeaseLivesUntilItsEnd) {
     root_.write("/var/lib/dhcpcd/eth1.lease", sample("dhcpcd-10/eth1.lease"));
     root_.age("/var/lib/dhcpcd/eth1.lease", now_);
-    const std::vector<Step> leased = address(2, {198, 51, 100, 121});
-    LiveMachine& machine = open({links(1), leased, links(1), leased});
+    const auto leased = [](std::uint32_t seconds) {
+        return lasting(2, {198, 51, 100, 121}, seconds);
+    };
+    LiveMachine& machine = open({links(1), leased(600), links(1), leased(0)});
     EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),
               PropertyValue{Servers{"198.51.100.1"}});
     now_ += 600;
@@ -173,7 +217,7 @@ TEST_F(LiveMachineTest, CapturedNetworkManagerStateOnItsLink) {
     root_.write("/run/NetworkManager/devices/2",
                 sample("networkmanager-internal/run-NetworkManager-devices-2.txt"));
     now_ = 1'795'216'300;
-    const auto tree = open({links(1), address(2, {198, 51, 100, 109})}).read();
+    const auto tree = open({links(1), lasting(2, {198, 51, 100, 109}, 316)}).read();
     EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPServerAddresses),
               PropertyValue{Servers{"198.51.100.1"}});
     EXPECT_EQ(valueOf(*tree, "eth1", Properties::AddressSource), number(1));
@@ -185,7 +229,8 @@ TEST_F(LiveMachineTest, CapturedBootpAtTheStartOfTheSystem) {
     EXPECT_EQ(valueOf(*tree, "eth1", Properties::AddressSource), number(2));
     EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPServerAddresses),
               PropertyValue{Servers{"203.0.113.1"}});
-    EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPEnabled), PropertyValue{false});
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPEnabled), PropertyValue{true})
+        << "it obtained the address";
 }
 
 TEST_F(LiveMachineTest, WhatCannotBeReadIsARemark) {
@@ -193,24 +238,25 @@ TEST_F(LiveMachineTest, WhatCannotBeReadIsARemark) {
     LiveMachine& machine =
         open({links(1), address(2, {192, 0, 2, 1}), links(1), address(2, {192, 0, 2, 1})});
     const auto tree = machine.read();
-    ASSERT_EQ(tree->remarks().size(), 1U);
-    EXPECT_THAT(tree->remarks()[0], HasSubstr("cannot read " + root_.path("/run/net-eth1.conf")));
+    ASSERT_EQ(tree->diagnostics().size(), 1U);
+    EXPECT_THAT(tree->diagnostics()[0].text,
+                HasSubstr("cannot read " + root_.path("/run/net-eth1.conf")));
     std::filesystem::remove_all(root_.path("/run/net-eth1.conf"));
     EXPECT_TRUE(machine.changed());
-    EXPECT_THAT(machine.read()->remarks(), IsEmpty());
+    EXPECT_THAT(ZR::Testing::textsOf(machine.read()->diagnostics()), IsEmpty());
 }
 
 TEST_F(LiveMachineTest, WhatCouldNotBeReadIsTriedAgain) {
     std::filesystem::create_directories(root_.path("/run/net-eth1.conf"));
     LiveMachine& machine = open({links(1), address(2, {192, 0, 2, 1}), links(1),
                                  address(2, {192, 0, 2, 1}), links(1), address(2, {192, 0, 2, 1})});
-    ASSERT_EQ(machine.read()->remarks().size(), 1U);
+    ASSERT_EQ(machine.read()->diagnostics().size(), 1U);
     EXPECT_TRUE(machine.changed()) << "it may be over already";
-    ASSERT_EQ(machine.read()->remarks().size(), 1U);
+    ASSERT_EQ(machine.read()->diagnostics().size(), 1U);
     EXPECT_FALSE(machine.changed()) << "it lasts";
     uptime_ += std::chrono::seconds{1};
     EXPECT_TRUE(machine.changed()) << "it may be over without a sign";
-    ASSERT_EQ(machine.read()->remarks().size(), 1U);
+    ASSERT_EQ(machine.read()->diagnostics().size(), 1U);
     EXPECT_FALSE(machine.changed());
     EXPECT_EQ(diagnostics_.size(), 1U);
 }
@@ -221,8 +267,9 @@ TEST_F(LiveMachineTest, WhatSeveralReadersCannotReadIsToldOnce) {
     std::filesystem::create_directories(root_.path("/var/lib"));
     std::filesystem::create_symlink(place, place);
     const auto tree = open({links(1), address(2, {192, 0, 2, 1})}).read();
-    EXPECT_THAT(tree->remarks(), testing::UnorderedElementsAre(HasSubstr("cannot read " + place),
-                                                               HasSubstr("cannot watch " + place)));
+    EXPECT_THAT(ZR::Testing::textsOf(tree->diagnostics()),
+                testing::UnorderedElementsAre(HasSubstr("cannot read " + place),
+                                              HasSubstr("cannot watch " + place)));
 }
 
 TEST_F(LiveMachineTest, TheComputerHasTheHostsName) {
@@ -241,7 +288,8 @@ TEST_F(LiveMachineTest, AMachineThatDoesNotTellItsNameShowsItsInterfaces) {
         EXPECT_THAT(interfaceNames(*tree), ElementsAre("eth1"));
         EXPECT_EQ(tree->node(0).description, "Computer");
         EXPECT_EQ(tree->find(0, Properties::Name)->value, PropertyValue{});
-        EXPECT_THAT(tree->remarks(), ElementsAre("the system does not tell its name: Bad address"));
+        EXPECT_THAT(ZR::Testing::textsOf(tree->diagnostics()),
+                    ElementsAre("the system does not tell its name: Bad address"));
         EXPECT_THAT(diagnostics_, ElementsAre("the system does not tell its name: Bad address"));
     }
     EXPECT_TRUE(machine.changed()) << "to be read again";
@@ -277,7 +325,7 @@ TEST_F(LiveMachineTest, AKernelThatDoesNotRespondHoldsNoCallerUp) {
     const auto tree = machine.read();
     EXPECT_THAT(interfaceNames(*tree), IsEmpty()) << "what was once read is not shown again";
     EXPECT_THAT(diagnostics_, ElementsAre(HasSubstr("network links: no response: ")));
-    EXPECT_THAT(tree->remarks(), testing::ElementsAreArray(diagnostics_));
+    EXPECT_THAT(ZR::Testing::textsOf(tree->diagnostics()), testing::ElementsAreArray(diagnostics_));
     EXPECT_TRUE(machine.changed()) << "to be read again";
 }
 
@@ -291,32 +339,116 @@ TEST_F(LiveMachineTest, InterruptedReadingsAreShownAndReadAgain) {
     EXPECT_TRUE(machine.changed());
 }
 
-TEST_F(LiveMachineTest, ASocketThatAloneTellsOfAClientIsAskedAboutEachTime) {
+// --- what nothing tells of
+
+TEST_F(LiveMachineTest, TheEndOfALeaseIsAChange) {
+    root_.write("/var/lib/dhcp/dhclient.eth1.leases", sample("isc-dhclient/dhclient.eth1.leases"));
+    LiveMachine& machine = open(readings(3, lasting(2, {198, 51, 100, 106}, 581)));
+    EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),
+              PropertyValue{Servers{"198.51.100.1"}});
+    EXPECT_FALSE(machine.changed());
+    now_ = 1'795'216'780;
+    EXPECT_FALSE(machine.changed());
+    now_ = 1'795'216'781;
+    EXPECT_TRUE(machine.changed());
+    EXPECT_TRUE(machine.changed()) << "until it is read";
+    static_cast<void>(machine.read());
+    EXPECT_FALSE(machine.changed());
+}
+
+TEST_F(LiveMachineTest, AClockThatWasSetBackIsAChange) {
+    LiveMachine& machine = open(readings(2, address(2, {192, 0, 2, 1})));
+    static_cast<void>(machine.read());
+    EXPECT_FALSE(machine.changed());
+    --now_;
+    EXPECT_TRUE(machine.changed());
+    static_cast<void>(machine.read());
+    EXPECT_FALSE(machine.changed());
+}
+
+TEST_F(LiveMachineTest, AClientThatStartsShowsWithinASecond) {
+    root_.write("/proc/loadavg", "0.10 0.20 0.30 1/100 16\n");
+    LiveMachine& machine = open(readings(2, address(2, {192, 0, 2, 1})));
+    static_cast<void>(machine.read());
+    startClient();
+    EXPECT_FALSE(machine.changed()) << "it is looked once a second";
+    ++now_;
+    EXPECT_TRUE(machine.changed());
+    EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPEnabled), PropertyValue{true});
+    ++now_;
+    EXPECT_FALSE(machine.changed());
+}
+
+TEST_F(LiveMachineTest, AClientThatBecomesOneAfterItStartedShows) {
+    root_.write("/proc/loadavg", "0.10 0.20 0.30 1/100 16\n");
+    LiveMachine& machine = open(readings(2, address(2, {192, 0, 2, 1})));
+    static_cast<void>(machine.read());
+    root_.write("/proc/17/comm", "sh\n");
+    root_.write("/proc/loadavg", "0.10 0.20 0.30 1/100 17\n");
+    ++now_;
+    EXPECT_FALSE(machine.changed());
+    startClient();
+    ++now_;
+    EXPECT_TRUE(machine.changed());
+}
+
+TEST_F(LiveMachineTest, WhileNoProcessStartsNoneIsLookedAt) {
+    root_.write("/proc/loadavg", "0.10 0.20 0.30 1/100 17\n");
+    LiveMachine& machine = open(readings(2, address(2, {192, 0, 2, 1})));
+    static_cast<void>(machine.read());
+    ++now_;
+    EXPECT_FALSE(machine.changed());
+    startClient();
+    ++now_;
+    EXPECT_FALSE(machine.changed()) << "it was there without a new number";
+    root_.write("/proc/loadavg", "0.20 0.20 0.30 1/100 18\n");
+    ++now_;
+    EXPECT_TRUE(machine.changed());
+}
+
+TEST_F(LiveMachineTest, ProcessesThatAreNotClientsAreNotAChange) {
+    root_.write("/proc/loadavg", "0.10 0.20 0.30 1/100 16\n");
+    LiveMachine& machine = open(readings(1, address(2, {192, 0, 2, 1})));
+    static_cast<void>(machine.read());
+    for (int process = 17; process < 20; ++process) {
+        root_.write("/proc/" + std::to_string(process) + "/comm", "sh\n");
+        root_.write("/proc/loadavg", "0.10 0.20 0.30 1/100 " + std::to_string(process) + "\n");
+        ++now_;
+        EXPECT_FALSE(machine.changed()) << process;
+    }
+}
+
+TEST_F(LiveMachineTest, ASocketThatComesOrGoesShowsWithinASecond) {
     const std::string udp = "/proc/thread-self/net/udp";
     const std::string line =
         "1: 010200C0:0044 630200C0:0043 01 00000000:00000000 00:00000000 00000000 0\n";
-    std::deque<std::vector<Step>> responses;
-    for (int i = 0; i < 4; ++i) {
-        responses.push_back(links(1));
-        responses.push_back(address(2, {192, 0, 2, 1}));
-    }
-    LiveMachine& machine = open(std::move(responses));
+    LiveMachine& machine = open(readings(3, address(2, {192, 0, 2, 1})));
     root_.write(udp, line);
     EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),
               PropertyValue{Servers{"192.0.2.99"}});
     EXPECT_FALSE(machine.changed());
     root_.write(udp, "");
+    EXPECT_FALSE(machine.changed());
+    ++now_;
     EXPECT_TRUE(machine.changed());
     EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),
               PropertyValue{Servers{}});
     EXPECT_FALSE(machine.changed());
+    // A client that asks for its first address has no socket of the other kind yet.
+    root_.write("/proc/thread-self/net/packet",
+                "sk RefCnt Type Proto Iface R Rmem User Inode\n0 3 3 0003 2 1 0 0 1\n");
+    ++now_;
+    EXPECT_TRUE(machine.changed());
+}
 
-    // A program that could have it is watched itself.
-    root_.write(udp, line);
-    root_.write("/proc/17/comm", "NetworkManager\n");
-    static_cast<void>(machine.read());
-    root_.write(udp, "");
+TEST_F(LiveMachineTest, WhatIsOnlyToldIsNotTriedAgain) {
+    root_.write("/etc/network/interfaces", "iface eth1 inet dhcp\n");
+    LiveMachine& machine = open(readings(1, address(2, {192, 0, 2, 1})));
+    EXPECT_THAT(ZR::Testing::textsOf(machine.read()->diagnostics()),
+                ElementsAre(HasSubstr("asks for DHCP, and no client runs")));
+    uptime_ += std::chrono::hours{1};
     EXPECT_FALSE(machine.changed());
+    EXPECT_THAT(diagnostics_, IsEmpty()) << "nothing was wrong with the reading";
 }
 
 TEST_F(LiveMachineTest, WhatTheKernelAskedForAtItsStart) {
@@ -329,11 +461,12 @@ TEST_F(LiveMachineTest, WhatTheKernelAskedForAtItsStart) {
     EXPECT_EQ(valueOf(*tree, "eth1", Properties::AddressSource), number(2));
     EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPServerAddresses),
               PropertyValue{Servers{"192.0.2.99"}});
-    EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPEnabled), PropertyValue{false});
+    EXPECT_EQ(valueOf(*tree, "eth1", Properties::DHCPEnabled), PropertyValue{true});
 }
 
 TEST_F(LiveMachineTest, AnAddressThatConnmanGotByDhcp) {
     root_.write("/proc/17/comm", "connmand\n");
+    root_.write("/proc/17/status", "State:\tS\nUid:\t0\t0\t0\t0\n");
     root_.write("/var/lib/connman/ethernet_5254_cable/settings",
                 "[ethernet_5254_cable]\nIPv4.method=dhcp\nIPv4.DHCP.LastAddress=192.0.2.1\n");
     LiveMachine& machine =
@@ -353,6 +486,7 @@ TEST_F(LiveMachineTest, BeforeItIsReadItCountsAsChanged) {
 
 TEST_F(LiveMachineTest, EveryPlaceThatItReadsIsWatched) {
     root_.write("/proc/17/comm", "dhclient\n");
+    root_.write("/proc/17/status", "State:\tS\nUid:\t0\t0\t0\t0\n");
     root_.write("/proc/17/cmdline", std::string{"dhclient\0-lf\0/srv/own.leases\0eth1\0", 34});
     for (const char* process : {"17", "thread-self"}) {
         std::filesystem::create_directories(root_.path("/proc/") + process + "/ns");

@@ -52,22 +52,81 @@ class MachineTest : public testing::Test {
 };
 
 TEST_F(MachineTest, LeasesOfBothProtocolsStandApart) {
-    facts_.addresses.push_back({.ifindex = 2, .ip = "2001:db8::2"_ip});
+    facts_.addresses.push_back({.ifindex = 2, .ip = "2001:db8::2"_ip, .validLifetime = 600});
     facts_.clients.leases = {lease("eth2", "192.0.2.2"), lease("eth2", "2001:db8::2")};
     const InterfaceView& view = first();
     EXPECT_THAT(view.leases, ElementsAre(Pointee(facts_.clients.leases[0])));
     EXPECT_THAT(view.leases6, ElementsAre(Pointee(facts_.clients.leases[1])));
 }
 
-TEST_F(MachineTest, OnlyWhatOutlivesItsEndIsKeptBehindIt) {
+TEST_F(MachineTest, ALeaseThatHasEndedIsKeptWhileItsAddressIsThere) {
     facts_.clients.leases = {lease("eth2", "192.0.2.2")};
     facts_.clients.leases[0].expires = now;
-    EXPECT_EQ(first().formerLease, nullptr);
+    facts_.addresses[0].validLifetime = Address::infinite;
+    EXPECT_THAT(first().ended, IsEmpty()) << "such a client sets addresses with an end";
     facts_.clients.leases[0].outlivesEnd = true;
-    EXPECT_NE(first().formerLease, nullptr);
+    EXPECT_THAT(first().ended, ElementsAre(Pointee(facts_.clients.leases[0])));
     EXPECT_THAT(first().leases, IsEmpty());
     facts_.addresses.clear();
-    EXPECT_EQ(first().formerLease, nullptr);
+    EXPECT_THAT(first().ended, IsEmpty());
+}
+
+TEST_F(MachineTest, ItChangesByItselfWhenTheFirstLeaseEndsOrIsReboundNext) {
+    EXPECT_EQ(machine().changesAt(), Lease::never);
+    facts_.clients.leases = {lease("eth2", "192.0.2.2"), lease("eth3", "192.0.2.3")};
+    EXPECT_EQ(machine().changesAt(), now + 600);
+    facts_.clients.leases[1].rebinds = now + 525;
+    EXPECT_EQ(machine().changesAt(), now + 525);
+    facts_.clients.leases[1].rebinds = now;
+    EXPECT_EQ(machine().changesAt(), now + 600);
+    facts_.clients.leases[0].expires = now + 599;
+    EXPECT_EQ(machine().changesAt(), now + 599);
+    facts_.addresses.clear();
+    EXPECT_EQ(machine().changesAt(), Lease::never) << "no lease is live";
+}
+
+TEST_F(MachineTest, ALeaseOfUnknownEndHasThatOfItsAddress) {
+    facts_.clients.leases = {lease("eth2", "192.0.2.2")};
+    facts_.clients.leases[0].expires.reset();
+    EXPECT_EQ(first().leases.at(0)->expires, now + 600);
+}
+
+TEST_F(MachineTest, AClientHasItsLinkWhateverKindItIs) {
+    facts_.links[0].kind = "tun";
+    EXPECT_EQ(machine().interfaces().size(), 1U);
+    facts_.clients.processes = {
+        {.client = Client::Dhclient, .interfaces = {"eth2"_name}, .leaseFile = ""}};
+    EXPECT_EQ(machine().interfaces().size(), 2U);
+    facts_.clients.processes[0].heardLinks = {3};
+    EXPECT_EQ(machine().interfaces().size(), 1U) << "another link has the name by now";
+    facts_.clients.processes[0].heardLinks = {2};
+    EXPECT_EQ(machine().interfaces().size(), 2U);
+    facts_.clients.processes.clear();
+    facts_.clients.managements = {{.client = Client::Networkd,
+                                   .ifindex = 2,
+                                   .dhcp4 = false,
+                                   .dhcp6 = {},
+                                   .staticAddresses = {}}};
+    EXPECT_EQ(machine().interfaces().size(), 1U);
+    facts_.clients.managements[0].dhcp6 = true;
+    EXPECT_EQ(machine().interfaces().size(), 2U);
+    facts_.links[0].flags = IFF_LOOPBACK;
+    EXPECT_EQ(machine().interfaces().size(), 1U);
+}
+
+TEST_F(MachineTest, ACableThatLeadsOutOfAContainerIsAnInterface) {
+    for (Link& link : facts_.links) {
+        link.kind = "veth";
+        link.farNamespace = static_cast<std::int32_t>(link.ifindex);
+    }
+    facts_.addresses.clear();
+    EXPECT_EQ(machine().interfaces().size(), 1U) << "the other leads elsewhere";
+    EXPECT_EQ(first().link->ifindex, 2U);
+    facts_.addresses = {{.ifindex = 3, .ip = "fe80::1"_ip}};
+    EXPECT_EQ(machine().interfaces().size(), 1U);
+    EXPECT_EQ(first().link->ifindex, 3U);
+    facts_.links[0].farNamespace = 3;
+    EXPECT_EQ(machine().interfaces().size(), 2U);
 }
 
 TEST_F(MachineTest, ARenamedLinkIsKnownByItsAddressAndTheAddressesEnd) {
@@ -79,6 +138,12 @@ TEST_F(MachineTest, ARenamedLinkIsKnownByItsAddressAndTheAddressesEnd) {
     }
     facts_.clients.leases[0].expires = std::nullopt;
     EXPECT_EQ(machine().interfaces()[1].leases.size(), 0U);
+}
+
+TEST_F(MachineTest, ALinkThatTookTheNameOfARenamedOneDoesNotGetItsLease) {
+    facts_.clients.leases = {lease("eth2", "192.0.2.3")};
+    EXPECT_THAT(first().leases, IsEmpty());
+    EXPECT_EQ(machine().interfaces()[1].leases.size(), 1U);
 }
 
 TEST_F(MachineTest, ARenamedLinkOfUdhcpcHasAnAddressWithoutAnEnd) {
@@ -141,7 +206,7 @@ TEST_F(MachineTest, AClientThatNamesLinksByIndexIsTakenAtItsWord) {
     EXPECT_EQ(machine().interfaces()[1].leases.size(), 0U);
 }
 
-TEST_F(MachineTest, TheFirstConfigurationOfALinkCounts) {
+TEST_F(MachineTest, EachConfigurationBelongsToItsLink) {
     const LinkConfiguration one{.client = Client::Ifupdown,
                                 .interfaceName = "eth2"_name,
                                 .dhcp4 = true,
@@ -150,8 +215,8 @@ TEST_F(MachineTest, TheFirstConfigurationOfALinkCounts) {
     LinkConfiguration other = one;
     other.client = Client::Ifcfg;
     facts_.clients.configurations = {one, other};
-    EXPECT_THAT(first().configuration, Pointee(one));
-    EXPECT_EQ(machine().interfaces()[1].configuration, nullptr);
+    EXPECT_THAT(first().configurations, ElementsAre(Pointee(one), Pointee(other)));
+    EXPECT_THAT(machine().interfaces()[1].configurations, IsEmpty());
 }
 
 TEST_F(MachineTest, ASocketBelongsToTheLinkOfItsAddress) {

@@ -22,7 +22,10 @@ TEST(Precedence, RowsOfAPropertyStandTogether) {
         }
         EXPECT_FALSE(row.reason.empty());
     }
-    EXPECT_EQ(finished.size(), NodeLexicon::properties.size());
+    EXPECT_EQ(finished, (std::set<Properties>{Properties::Name, Properties::NameMaxLength,
+                                              Properties::InterfaceState, Properties::IPv4Address,
+                                              Properties::DHCPEnabled, Properties::AddressSource,
+                                              Properties::DHCPServerAddresses}));
 }
 
 TEST(Precedence, TheLastRowOfEachPropertyFindsAValueForAnyInterface) {

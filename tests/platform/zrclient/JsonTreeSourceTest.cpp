@@ -5,6 +5,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include "kit/Diagnostics.h"
 #include "kit/HostNameFake.h"
 #include "kit/LogCapture.h"
 #include "kit/ZrclientSupport.h"
@@ -213,9 +214,11 @@ TEST_F(JsonTreeSourceTest, AFaultIsLoggedOnceWithItsPlace) {
 
 TEST_F(JsonTreeSourceTest, ASnapshotTellsWhyItsFileCannotBeUsed) {
     JsonTreeSource source(path_, "my tree");
-    EXPECT_THAT(source.read()->remarks(), ElementsAre("my tree: No such file or directory"));
+    EXPECT_THAT(textsOf(source.read()->diagnostics()),
+                ElementsAre("my tree: No such file or directory"));
     writeFile(path_, "{\"nodes\": [\n  {\"type\": 40}]}");
-    EXPECT_THAT(source.read()->remarks(), ElementsAre("my tree:2:12: \"type\" must be a text"));
+    EXPECT_THAT(textsOf(source.read()->diagnostics()),
+                ElementsAre("my tree:2:12: \"type\" must be a text"));
     EXPECT_THAT(log_.logMessages(), ElementsAre(EndsWith(path_ + ": No such file or directory"),
                                                 EndsWith(path_ + ":2:12: \"type\" must be a text")))
         << "the log has the file's own name";
@@ -226,7 +229,8 @@ TEST_F(JsonTreeSourceTest, ASnapshotTellsOfSlipsInItsFileAndTheLogDoesNot) {
     JsonTreeSource source(path_);
     const auto snapshot = source.read();
     EXPECT_THAT(snapshot->nodes(), SizeIs(1));
-    EXPECT_THAT(snapshot->remarks(), ElementsAre(HasSubstr(path_ + ":1:21: the type ")));
+    EXPECT_THAT(textsOf(snapshot->diagnostics()),
+                ElementsAre(HasSubstr(path_ + ":1:21: the type ")));
     EXPECT_THAT(log_.logMessages(), IsEmpty());
 }
 

@@ -108,6 +108,18 @@ TEST(JsonTree, TakesValuesByTheirKind) {
     }
 }
 
+TEST(JsonTree, AListHoldsTextsOrNumbers) {
+    const auto listOf = [](const char* json) {
+        return parsed(withProperty(json))->find(0, Properties::IPv4Address)->value;
+    };
+    EXPECT_EQ(listOf("[54, 1]"), PropertyValue(std::vector<std::uint64_t>{54, 1}));
+    EXPECT_EQ(listOf("[]"), PropertyValue(std::vector<std::string>{}));
+    EXPECT_EQ(listOf(R"([54, "1"])"), PropertyValue());
+    EXPECT_EQ(listOf(R"(["1", 54])"), PropertyValue());
+    EXPECT_EQ(listOf("[-1]"), PropertyValue());
+    EXPECT_EQ(listOf("[1.5]"), PropertyValue());
+}
+
 TEST(JsonTree, TheLastOfEqualPropertyNamesCounts) {
     const auto snapshot = parsed(R"({"nodes": [{"type": "NetworkInterface", "properties":
         {"Name": "a", "DHCPEnabled": true, "Name": "b", "DHCPEnabled": null}}]})");

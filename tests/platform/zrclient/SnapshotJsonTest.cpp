@@ -23,6 +23,9 @@ std::shared_ptr<const Snapshot> everyKind() {
     builder.property(Properties::AddressSource, PropertyValue(), true);
     builder.property(Properties::DHCPServerAddresses, std::vector<std::string>{"192.0.2.1", ""});
     const auto twin = builder.add(network, "NetworkInterface", "twin");
+    builder.add(twin, "DHCPLease", "DHCP lease");
+    builder.property(Properties::LeaseExpires, NodeLexicon::never);
+    builder.property(Properties::OptionsReceived, std::vector<std::uint64_t>{1, 54, 119});
     builder.add(twin, "NetworkInterface", "below");
     builder.property(Properties::DHCPServerAddresses, std::vector<std::string>{});
     builder.add(network, "NetworkInterface", "twin");

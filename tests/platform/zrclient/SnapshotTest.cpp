@@ -266,12 +266,13 @@ TEST(Snapshot, APropertyMaySayWhereItCameFrom) {
 
 TEST(Snapshot, WhatCouldNotBeReadIsARemark) {
     SnapshotBuilder builder;
-    builder.remark("cannot read this");
-    builder.remark("nor that");
+    builder.diagnostic(ZR::Diagnostic{"cannot read this"});
+    builder.diagnostic(ZR::Diagnostic{"nor that", ZR::Diagnostic::Kind::Denied});
     const auto snapshot = builder.build();
-    ASSERT_EQ(snapshot->remarks().size(), 2U);
-    EXPECT_EQ(snapshot->remarks()[1], "nor that");
-    EXPECT_TRUE(builder.build()->remarks().empty());
+    ASSERT_EQ(snapshot->diagnostics().size(), 2U);
+    EXPECT_EQ(snapshot->diagnostics()[1],
+              (ZR::Diagnostic{"nor that", ZR::Diagnostic::Kind::Denied}));
+    EXPECT_TRUE(builder.build()->diagnostics().empty());
 }
 
 }  // namespace

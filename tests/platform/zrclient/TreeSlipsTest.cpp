@@ -2,6 +2,7 @@
 
 #include <gmock/gmock.h>
 
+#include "kit/Diagnostics.h"
 #include "sources/JsonTree.h"
 
 namespace ZR::Testing {
@@ -17,8 +18,7 @@ std::vector<std::string> slipsOf(const std::string& text, const std::string& hos
     if (snapshot == nullptr) {
         return {"a fault"};
     }
-    const auto remarks = (*snapshot)->remarks();
-    return {remarks.begin(), remarks.end()};
+    return textsOf((*snapshot)->diagnostics());
 }
 
 /// An interface in its network and computer, in line 4 from column 1.
@@ -157,7 +157,7 @@ TEST(TreeSlips, OfManyTheFirstFewAreTold) {
 
 TEST(TreeSlips, AreNotLookedForWithoutANameToTellThemUnder) {
     const JsonTree tree = parseJsonTree(R"({"nodes": [{"type": "computersystem"}]})", "here");
-    EXPECT_THAT(std::get<0>(tree)->remarks(), IsEmpty());
+    EXPECT_THAT(std::get<0>(tree)->diagnostics(), IsEmpty());
 }
 
 }  // namespace

@@ -3,6 +3,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include "cimom/Instance.h"
 #include "kit/Host.h"
 #include "kit/Tree.h"
 #include "providerutilities/ProviderUtilities.h"

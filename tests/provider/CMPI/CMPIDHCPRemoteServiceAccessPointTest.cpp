@@ -6,6 +6,7 @@
 #include <array>
 
 #include "CMPI/ElementTables.h"
+#include "cimom/Instance.h"
 #include "kit/Host.h"
 #include "kit/Tree.h"
 

@@ -5,6 +5,7 @@
 
 #include <filesystem>
 
+#include "cimom/Instance.h"
 #include "kit/FileContent.h"
 #include "kit/Host.h"
 #include "kit/Tree.h"

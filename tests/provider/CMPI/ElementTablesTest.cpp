@@ -19,6 +19,8 @@
 #include "CMPI/CMPIDHCPRemoteServiceAccessPoint.h"
 #include "CMPI/CMPIDHCPSettingData.h"
 #include "CMPI/CMPISAPSAPDependency.h"
+#include "cimom/ClassDeclaration.h"
+#include "cimom/Instance.h"
 #include "kit/Host.h"
 
 namespace {

@@ -6,6 +6,7 @@
 #include <string>
 #include <vector>
 
+#include "cimom/Instance.h"
 #include "kit/Host.h"
 #include "kit/HostNameFake.h"
 #include "kit/LogCapture.h"

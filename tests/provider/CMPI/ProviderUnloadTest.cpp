@@ -5,6 +5,7 @@
 #include <dlfcn.h>
 #include <gtest/gtest.h>
 
+#include "cimom/Instance.h"
 #include "kit/Host.h"
 #include "kit/OpenDescriptors.h"
 #include "kit/Tree.h"

@@ -12,6 +12,8 @@
 #include <string>
 #include <vector>
 
+#include "cimom/ClassDeclaration.h"
+#include "cimom/Instance.h"
 #include "kit/AssociationMachine.h"
 #include "kit/LogCapture.h"
 

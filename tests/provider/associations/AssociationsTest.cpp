@@ -9,6 +9,7 @@
 #include <string>
 #include <vector>
 
+#include "cimom/Instance.h"
 #include "kit/AssociationMachine.h"
 #include "kit/Host.h"
 #include "kit/LogCapture.h"

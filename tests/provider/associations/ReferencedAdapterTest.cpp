@@ -11,6 +11,7 @@
 #include "CMPI/CMPIDHCPAssignmentSettingData.h"
 #include "CMPI/CMPIDHCPComputerSystem.h"
 #include "CMPI/CMPIIPProtocolEndpoint.h"
+#include "cimom/Instance.h"
 #include "include/Exceptions.h"
 #include "kit/AssociationMachine.h"
 #include "kit/LogCapture.h"

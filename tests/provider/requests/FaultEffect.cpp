@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <map>
 
+#include "cimom/Instance.h"
 #include "cimom/ObjectPathText.h"
 #include "kit/AssociationMachine.h"
 

@@ -1,5 +1,6 @@
 #include "Requests.h"
 
+#include "cimom/Instance.h"
 #include "kit/AssociationMachine.h"
 
 namespace test {

@@ -2,7 +2,9 @@
 
 #include <gtest/gtest.h>
 
+#include "cimom/ClassDeclaration.h"
 #include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
 #include "cimxml/Errors.h"
 #include "cimxml/ObjectWriter.h"
 

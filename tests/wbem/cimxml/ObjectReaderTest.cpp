@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include "cimom/Instance.h"
 #include "cimom/ObjectPathText.h"
 #include "cimxml/Errors.h"
 

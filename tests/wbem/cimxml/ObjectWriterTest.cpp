@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 
 #include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
 #include "cimom/ObjectPathText.h"
 #include "kit/ElementTable.h"
 

@@ -5,6 +5,7 @@
 #include <memory>
 #include <random>
 
+#include "cimom/ClassDeclaration.h"
 #include "cimom/ClassRepository.h"
 #include "cimxml/Call.h"
 #include "cimxml/ClassReader.h"

@@ -4,6 +4,8 @@
 
 #include <memory>
 
+#include "cimom/Instance.h"
+
 namespace cimom::wbem {
 
 NamedValue reference(const std::string& name, const ObjectPath& path) {

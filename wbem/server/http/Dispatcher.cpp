@@ -3,7 +3,7 @@
 #include <utility>
 
 #include "cimxml/Call.h"
-#include "operations/Modification.h"
+#include "operations/ModificationLog.h"
 
 namespace cimom::wbem {
 

@@ -1,5 +1,8 @@
 // Associators, References and their names (DSP0200, 5.4.2), of instances and of
 // classes.
+#include "cimom/ClassDeclaration.h"
+#include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
 #include "cimxml/ObjectWriter.h"
 #include "operations/ClassAssociations.h"
 #include "operations/Request.h"

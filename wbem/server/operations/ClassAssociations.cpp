@@ -2,7 +2,10 @@
 
 #include <algorithm>
 
+#include "cimom/ClassDeclaration.h"
+#include "cimom/ClassRepository.h"
 #include "cimom/Names.h"
+#include "cimom/Requests.h"
 
 namespace cimom::wbem {
 

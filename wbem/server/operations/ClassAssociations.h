@@ -2,8 +2,7 @@
 
 #include <vector>
 
-#include "cimom/ClassRepository.h"
-#include "cimom/Requests.h"
+#include "cimom/Forward.h"
 
 namespace cimom::wbem {
 

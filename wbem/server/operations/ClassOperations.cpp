@@ -1,6 +1,8 @@
 // Operations on classes (DSP0200, 5.4.2).
 #include <algorithm>
 
+#include "cimom/ClassDeclaration.h"
+#include "cimom/ClassRepository.h"
 #include "cimom/Names.h"
 #include "cimxml/ObjectWriter.h"
 #include "operations/Request.h"

@@ -1,7 +1,10 @@
 // Operations on instances that only read (DSP0200, 5.4.2).
 #include <algorithm>
 
+#include "cimom/ClassDeclaration.h"
+#include "cimom/ClassRepository.h"
 #include "cimom/Names.h"
+#include "cimom/Results.h"
 #include "cimxml/ObjectWriter.h"
 #include "operations/Request.h"
 

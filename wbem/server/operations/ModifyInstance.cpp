@@ -1,6 +1,10 @@
 #include <algorithm>
 
+#include "cimom/ClassDeclaration.h"
+#include "cimom/ClassRepository.h"
 #include "cimom/Names.h"
+#include "cimom/Results.h"
+#include "operations/Modification.h"
 #include "operations/Request.h"
 
 namespace cimom::wbem {

@@ -2,15 +2,13 @@
 
 #include <cstddef>
 
+#include "cimom/Forward.h"
 #include "cimxml/Call.h"
+#include "operations/Caller.h"
 #include "operations/EnumerationSessions.h"
-#include "operations/Modification.h"
+#include "operations/ModificationLog.h"
 #include "operations/ResponseBody.h"
 #include "wbem/Limits.h"
-
-namespace cimom {
-class ObjectManager;
-}
 
 namespace cimom::wbem {
 

@@ -3,6 +3,9 @@
 #include <optional>
 #include <utility>
 
+#include "cimom/ClassDeclaration.h"
+#include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
 #include "cimxml/ObjectWriter.h"
 #include "cimxml/XmlText.h"
 #include "operations/PulledRecords.h"

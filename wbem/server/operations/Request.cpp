@@ -2,6 +2,9 @@
 
 #include <algorithm>
 
+#include "cimom/ClassDeclaration.h"
+#include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
 #include "cimom/Names.h"
 #include "cimxml/ObjectWriter.h"
 #include "cimxml/PathLocation.h"

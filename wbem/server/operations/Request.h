@@ -9,9 +9,11 @@
 #include <vector>
 
 #include "cimom/ObjectManager.h"
+#include "cimom/Requests.h"
 #include "cimxml/Errors.h"
+#include "operations/Caller.h"
 #include "operations/EnumerationSessions.h"
-#include "operations/Modification.h"
+#include "operations/ModificationLog.h"
 #include "operations/Parameters.h"
 #include "operations/ResponseBody.h"
 #include "operations/Spool.h"

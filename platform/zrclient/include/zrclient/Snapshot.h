@@ -1,5 +1,6 @@
 #pragma once
 
+#include <array>
 #include <cstdint>
 #include <memory>
 #include <span>
@@ -9,14 +10,15 @@
 #include <variant>
 #include <vector>
 
+#include "zrclient/Diagnostic.h"
 #include "zrclient/NodeLexicon.h"
 
 namespace ZR {
 
 /// The value of one property. std::monostate is a value that no reader can
 /// take: the property is present (isPropertyReadOnly finds it) but unreadable.
-using PropertyValue =
-    std::variant<std::monostate, bool, std::uint64_t, std::string, std::vector<std::string>>;
+using PropertyValue = std::variant<std::monostate, bool, std::uint64_t, std::string,
+                                   std::vector<std::string>, std::vector<std::uint64_t>>;
 
 struct SnapshotProperty {
     NodeLexicon::Properties id{};
@@ -61,8 +63,8 @@ class Snapshot {
     /// asked to tell, or there is no such property.
     [[nodiscard]] std::string_view origin(Index index, NodeLexicon::Properties id) const;
 
-    /// What could not be read, or not for certain, one sentence each.
-    [[nodiscard]] std::span<const std::string> remarks() const noexcept { return remarks_; }
+    /// What could not be read, or is not as it looks.
+    [[nodiscard]] std::span<const Diagnostic> diagnostics() const noexcept { return diagnostics_; }
 
     /// First node of a lexicon type in document order, or none. O(1).
     [[nodiscard]] Index first(NodeLexicon::NodeType type) const noexcept;
@@ -73,21 +75,20 @@ class Snapshot {
     /// The node that a path names, or none. O(nodes up to that one).
     [[nodiscard]] Index resolve(std::string_view path) const noexcept;
 
-    /// Equal nodes with equal properties in equal order, equal origins and remarks.
+    /// Equal nodes with equal properties in equal order, equal origins and diagnostics.
     bool operator==(const Snapshot&) const = default;
 
   private:
     friend class SnapshotBuilder;
-    Snapshot() = default;
+    Snapshot() { firstOfType_.fill(none); }
 
     [[nodiscard]] bool isPathOf(std::string_view path, Index index) const noexcept;
 
     std::vector<Node> nodes_;
     std::vector<SnapshotProperty> properties_;
     std::vector<std::string> origins_;  // of the properties in their order; may be fewer
-    std::vector<std::string> remarks_;
-    Index firstNetworkInterface_ = none;
-    Index firstComputerSystem_ = none;
+    std::vector<Diagnostic> diagnostics_;
+    std::array<Index, NodeLexicon::nodeTypes.size()> firstOfType_;  // in the lexicon's order
 };
 
 /// Builds a snapshot in document order: add a node after its parent and before
@@ -107,8 +108,8 @@ class SnapshotBuilder {
     /// long as it is not called.
     void origin(std::string text) { origin_ = std::move(text); }
 
-    /// Adds what could not be read, or not for certain.
-    void remark(std::string text) { remarks_.push_back(std::move(text)); }
+    /// Adds what could not be read, or is not as it looks.
+    void diagnostic(Diagnostic what) { diagnostics_.push_back(std::move(what)); }
 
     /// The finished snapshot; the builder is empty afterwards.
     [[nodiscard]] std::shared_ptr<const Snapshot> build();
@@ -118,7 +119,7 @@ class SnapshotBuilder {
     std::vector<SnapshotProperty> properties_;
     std::string origin_;
     std::vector<std::string> origins_;
-    std::vector<std::string> remarks_;
+    std::vector<Diagnostic> diagnostics_;
 };
 
 }  // namespace ZR

@@ -99,6 +99,11 @@ class TreeReader {
     }
     bool number_unsigned(std::uint64_t value) {
         lookAtKind(JsonKind::number);
+        if (next() == Slot::propertyEntry) {
+            listIsReadable_ = listIsReadable_ && list_.empty();
+            numbers_.push_back(value);
+            return passed(1);
+        }
         if (next() == Slot::property) {
             slips_.add(tokens_.start(), slipOfNumber(property_, value));
         }
@@ -126,7 +131,7 @@ class TreeReader {
                 break;
             case Slot::propertyEntry:
                 lookAtText(value);
-                listIsReadable_ = listIsReadable_ && isReadable(value);
+                listIsReadable_ = listIsReadable_ && numbers_.empty() && isReadable(value);
                 list_.push_back(expanded(value));
                 break;
             case Slot::readOnlyEntry:
@@ -202,6 +207,7 @@ class TreeReader {
         switch (slot) {
             case Slot::property:
                 list_.clear();
+                numbers_.clear();
                 listIsReadable_ = true;
                 [[fallthrough]];
             case Slot::nodes:
@@ -223,7 +229,7 @@ class TreeReader {
         const bool isList = frames_.back().what == Slot::property;
         frames_.pop_back();
         if (isList) {
-            set(listIsReadable_ ? PropertyValue(std::exchange(list_, {})) : PropertyValue());
+            set(takeList());
         }
         return passed(0);
     }
@@ -305,9 +311,8 @@ class TreeReader {
         const Slot slot = next();
         if (slot == Slot::property) {
             slips_.add(tokens_.start(), slipOfKind(property_, found));
-        } else if (slot == Slot::propertyEntry && found != JsonKind::text &&
-                   slipOfKind(property_, JsonKind::list).empty()) {
-            slips_.add(tokens_.start(), "the list must hold texts only");
+        } else if (slot == Slot::propertyEntry) {
+            slips_.add(tokens_.start(), slipOfEntry(property_, found));
         }
     }
 
@@ -333,6 +338,15 @@ class TreeReader {
         } else {
             properties.push_back({property_, false, std::move(value)});
         }
+    }
+
+    /// The list that was read: of texts, or of numbers; a mixed one cannot be read.
+    [[nodiscard]] PropertyValue takeList() {
+        if (!listIsReadable_) {
+            return {};
+        }
+        return numbers_.empty() ? PropertyValue(std::exchange(list_, {}))
+                                : PropertyValue(std::exchange(numbers_, {}));
     }
 
     /// Takes a value that is not a text, if any such may stand in the slot.
@@ -417,7 +431,7 @@ class TreeReader {
             }
         }
         for (std::string& slip : slips_.told()) {
-            builder.remark(std::move(slip));
+            builder.diagnostic(Diagnostic{std::move(slip), Diagnostic::Kind::Note});
         }
         return builder.build();
     }
@@ -432,6 +446,7 @@ class TreeReader {
     Slot slot_ = Slot::ignored;
     NodeLexicon::Properties property_{};
     std::vector<std::string> list_;
+    std::vector<std::uint64_t> numbers_;
     bool listIsReadable_ = true;
     unsigned nodeDepth_ = 0;
     unsigned ignoredDepth_ = 0;

@@ -81,7 +81,7 @@ std::shared_ptr<const Snapshot> JsonTreeSource::tryToRead() {
 std::shared_ptr<const Snapshot> JsonTreeSource::unusable(const std::string& reason) {
     report(watch_.path() + reason);
     SnapshotBuilder builder;
-    builder.remark(name_ + reason);
+    builder.diagnostic(Diagnostic{name_ + reason});
     return builder.build();
 }
 

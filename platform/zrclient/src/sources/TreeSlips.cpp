@@ -5,7 +5,6 @@
 #include <algorithm>
 #include <array>
 #include <limits>
-#include <optional>
 #include <set>
 #include <variant>
 
@@ -17,36 +16,77 @@ namespace {
 
 using NodeLexicon::Properties;
 
-/// What the readers of a property ask for; nothing for a property that any value may have.
-std::optional<JsonKind> kindOf(Properties id) {
+/// What the readers of a property ask for.
+enum class Wanted : std::uint8_t { truth, number, time, text, texts, numbers, anything };
+
+Wanted wantedOf(Properties id) {
     switch (id) {
         case Properties::DHCPEnabled:
-            return JsonKind::truth;
+            return Wanted::truth;
         case Properties::AddressSource:
         case Properties::NameMaxLength:
         case Properties::InterfaceState:
-            return JsonKind::number;
+        case Properties::ClientState:
+        case Properties::Process:
+            return Wanted::number;
+        case Properties::LeaseObtained:
+        case Properties::RenewalTime:
+        case Properties::RebindingTime:
+        case Properties::LeaseExpires:
+            return Wanted::time;
         case Properties::IPv4Address:
         case Properties::Name:
-            return JsonKind::text;
+        case Properties::Family:
+        case Properties::Address:
+        case Properties::ServerAddress:
+        case Properties::ClientIdentifier:
+        case Properties::Client:
+        case Properties::Source:
+            return Wanted::text;
         case Properties::DHCPServerAddresses:
-            return JsonKind::list;
-        default:
-            return std::nullopt;
+            return Wanted::texts;
+        case Properties::OptionsReceived:
+            return Wanted::numbers;
     }
+    return Wanted::anything;  // a number that the lexicon does not have
 }
 
-const char* wordsFor(JsonKind kind) {
-    switch (kind) {
-        case JsonKind::truth:
-            return "true or false";
-        case JsonKind::number:
-            return "a number from 0 to 4294967295";
-        case JsonKind::text:
-            return "a text";
-        default:
-            return "a list of texts";
+bool isOf(Wanted wanted, JsonKind found) {
+    switch (wanted) {
+        case Wanted::truth:
+            return found == JsonKind::truth;
+        case Wanted::number:
+        case Wanted::time:
+            return found == JsonKind::number;
+        case Wanted::text:
+            return found == JsonKind::text;
+        case Wanted::texts:
+        case Wanted::numbers:
+            return found == JsonKind::list;
+        case Wanted::anything:
+            break;
     }
+    return true;
+}
+
+const char* wordsFor(Wanted wanted) {
+    switch (wanted) {
+        case Wanted::truth:
+            return "true or false";
+        case Wanted::number:
+            return "a number from 0 to 4294967295";
+        case Wanted::time:
+            return "a number of seconds since 1970";
+        case Wanted::text:
+            return "a text";
+        case Wanted::texts:
+            return "a list of texts";
+        case Wanted::numbers:
+            return "a list of numbers";
+        case Wanted::anything:
+            break;
+    }
+    return "anything";
 }
 
 std::string inQuotes(std::string_view text) {
@@ -54,8 +94,8 @@ std::string inQuotes(std::string_view text) {
     return '"' + std::string(text.substr(0, longest)) + (text.size() > longest ? "...\"" : "\"");
 }
 
-std::string mustBe(Properties id, JsonKind kind) {
-    return inQuotes(NodeLexicon::nameOf(id)) + " must be " + wordsFor(kind);
+std::string mustBe(Properties id, Wanted wanted) {
+    return inQuotes(NodeLexicon::nameOf(id)) + " must be " + wordsFor(wanted);
 }
 
 bool isAddress(int family, const std::string& text) {
@@ -105,21 +145,34 @@ std::string foreignName(const std::string& name, const std::string& hostName) {
 }  // namespace
 
 std::string slipOfKind(Properties id, JsonKind found) {
-    const auto wanted = kindOf(id);
-    return wanted && *wanted != found ? mustBe(id, *wanted) : std::string();
+    const Wanted wanted = wantedOf(id);
+    return isOf(wanted, found) ? std::string() : mustBe(id, wanted);
+}
+
+std::string slipOfEntry(Properties id, JsonKind found) {
+    switch (wantedOf(id)) {
+        case Wanted::texts:
+            return found == JsonKind::text ? "" : "the list must hold texts only";
+        case Wanted::numbers:
+            return found == JsonKind::number ? "" : "the list must hold numbers only";
+        default:
+            return {};  // that there is a list at all was told
+    }
 }
 
 std::string slipOfNumber(Properties id, std::uint64_t number) {
     const bool fits = number <= std::numeric_limits<std::uint32_t>::max();
-    return kindOf(id) == JsonKind::number && !fits ? mustBe(id, JsonKind::number) : std::string();
+    return wantedOf(id) == Wanted::number && !fits ? mustBe(id, Wanted::number) : std::string();
 }
 
 std::string slipOfText(Properties id, const std::string& text) {
     if (id == Properties::IPv4Address && !isAddress(AF_INET, text)) {
         return inQuotes(text) + " is not an IPv4 address";
     }
+    const bool isOfEitherFamily = id == Properties::DHCPServerAddresses ||
+                                  id == Properties::Address || id == Properties::ServerAddress;
     // A link-local address may have its link behind it.
-    if (id == Properties::DHCPServerAddresses && !isAddress(AF_INET, text) &&
+    if (isOfEitherFamily && !isAddress(AF_INET, text) &&
         !isAddress(AF_INET6, text.substr(0, text.find('%')))) {
         return inQuotes(text) + " is not an IP address";
     }

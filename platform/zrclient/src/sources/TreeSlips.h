@@ -37,6 +37,8 @@ enum class JsonKind : std::uint8_t { truth, number, text, list, other };
 /// Of a value that is not of its property's kind. A null is not told: it is how an
 /// unreadable value is written.
 [[nodiscard]] std::string slipOfKind(NodeLexicon::Properties id, JsonKind found);
+/// Of an entry of a list that is not of the kind that the property's list holds.
+[[nodiscard]] std::string slipOfEntry(NodeLexicon::Properties id, JsonKind found);
 /// Of a number that the property cannot hold.
 [[nodiscard]] std::string slipOfNumber(NodeLexicon::Properties id, std::uint64_t number);
 /// Of a text, alone or in a list, that should be an address.

@@ -5,6 +5,7 @@
 #include <sys/socket.h>
 
 #include "LinuxSupport.h"
+#include "kit/Diagnostics.h"
 
 namespace ZR::Live {
 namespace {
@@ -52,7 +53,7 @@ TEST_F(ConnmanTest, WhileItRunsItsAddressesAreClaims) {
                                                 .expires = std::nullopt,
                                                 .origin = directory + "/settings"}));
     EXPECT_THAT(facts.places, testing::Contains(WatchedPlace{directory, "settings"}));
-    EXPECT_THAT(facts.diagnostics, IsEmpty());
+    EXPECT_THAT(ZR::Testing::textsOf(facts.diagnostics), IsEmpty());
 }
 
 TEST_F(ConnmanTest, WhatItLeftWhenItEndedProvesNothing) {

@@ -3,11 +3,19 @@
 #include <fcntl.h>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <sched.h>
 #include <sys/socket.h>
 #include <sys/stat.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
+#include <array>
+#include <csignal>
+
 #include "LinuxSupport.h"
+#include "clients/ProcessFiles.h"
+#include "formats/Trust.h"
+#include "kit/Namespaces.h"
 
 namespace ZR::Live {
 namespace {
@@ -78,8 +86,20 @@ class DhclientTest : public testing::Test {
     ClientFacts read(std::vector<ClientProcess> processes = {}) const {
         ClientFacts facts;
         facts.processes = std::move(processes);
-        readDhclient({.files = root_.path()}, facts);
+        readDhclient({.files = root_.path(""), .proc = root_.path("/proc")}, facts);
         return facts;
+    }
+    /// The leases without what the parser's tests are about.
+    static std::vector<Lease> claims(const ClientFacts& facts) {
+        std::vector<Lease> claims = facts.leases;
+        for (Lease& lease : claims) {
+            lease.obtained.reset();
+            lease.renews.reset();
+            lease.rebinds.reset();
+            lease.options.clear();
+            lease.clientIdentifier.clear();
+        }
+        return claims;
     }
     static std::vector<std::optional<IpAddress>> servers(const ClientFacts& facts) {
         std::vector<std::optional<IpAddress>> servers;
@@ -130,7 +150,7 @@ TEST_F(DhclientTest, OtherFilesBesideThemAreNotRead) {
 
 TEST_F(DhclientTest, ALeaseBecomesAFullClaim) {
     root_.write("/var/lib/dhcp/dhclient.eth1.leases", sample("isc-dhclient/dhclient.eth1.leases"));
-    EXPECT_EQ(read().leases,
+    EXPECT_EQ(claims(read()),
               (std::vector<Lease>{{.client = Client::Dhclient,
                                    .interfaceName = "eth1"_name,
                                    .address = "198.51.100.106"_ip,
@@ -142,7 +162,7 @@ TEST_F(DhclientTest, ALeaseBecomesAFullClaim) {
 TEST_F(DhclientTest, ADhcpv6LeaseBecomesAClaimWithoutAServerAddress) {
     root_.write("/var/lib/dhcp/dhclient6.eth1.leases",
                 sample("isc-dhclient/dhclient6.eth1.leases.after-release"));
-    EXPECT_EQ(read().leases,
+    EXPECT_EQ(claims(read()),
               (std::vector<Lease>{{.client = Client::Dhclient,
                                    .interfaceName = "eth1"_name,
                                    .address = "2001:db8:99::16e"_ip,
@@ -161,7 +181,7 @@ TEST_F(DhclientTest, CapturedUnderNetworkManager) {
     }
     const ClientFacts facts =
         read({process({"eth1"_name}, "/var/lib/NetworkManager/dhclient-" + profile)});
-    EXPECT_EQ(facts.leases,
+    EXPECT_EQ(claims(facts),
               (std::vector<Lease>{
                   {.client = Client::Dhclient,
                    .interfaceName = "eth1"_name,
@@ -180,7 +200,7 @@ TEST_F(DhclientTest, CapturedUnderNetworkManager) {
 
 TEST_F(DhclientTest, CapturedUnderIfupdown) {
     root_.write("/var/lib/dhcp/dhclient.eth1.leases", sample("ifupdown/dhclient.eth1.leases"));
-    EXPECT_EQ(read().leases,
+    EXPECT_EQ(claims(read()),
               (std::vector<Lease>{{.client = Client::Dhclient,
                                    .interfaceName = "eth1"_name,
                                    .address = "198.51.100.106"_ip,
@@ -192,7 +212,91 @@ TEST_F(DhclientTest, CapturedUnderIfupdown) {
 TEST_F(DhclientTest, AClaimWithoutAnEndIsNone) {
     root_.write("/var/lib/dhcp/dhclient.leases",
                 "lease { interface \"eth1\"; fixed-address 192.0.2.7; }");
+    const ClientFacts facts = read();
+    EXPECT_THAT(facts.leases, IsEmpty());
+    EXPECT_THAT(facts.diagnostics,
+                ElementsAre(Diagnostic{
+                    root_.path("/var/lib/dhcp/dhclient.leases") + ", line 1: the lease has no end",
+                    Diagnostic::Kind::Damaged}));
+}
+
+TEST_F(DhclientTest, TheGoodBlocksOfADamagedFileCount) {
+    root_.write("/var/lib/dhcp/dhclient.leases",
+                lease("eth1", "192.0.2.7", "192.0.2.1") + "lease { ? }\n" +
+                    lease("eth2", "192.0.2.8", "192.0.2.2") + "lease {\n  interface \"eth1\";");
+    const ClientFacts facts = read();
+    EXPECT_THAT(servers(facts), ElementsAre("192.0.2.1"_ip, "192.0.2.2"_ip));
+    const std::string path = root_.path("/var/lib/dhcp/dhclient.leases");
+    EXPECT_THAT(facts.diagnostics,
+                ElementsAre(Diagnostic{path + ", line 2: the lease has no address",
+                                       Diagnostic::Kind::Damaged},
+                            Diagnostic{path + ", line 4: the file ends within this block",
+                                       Diagnostic::Kind::Damaged}));
+}
+
+TEST_F(DhclientTest, ALeaseTellsItsTimesItsOptionsAndItsClient) {
+    root_.write("/var/lib/dhcp/dhclient6.eth1.leases",
+                sample("isc-dhclient/dhclient6.eth1.leases"));
+    ClientProcess client = process({"eth1"_name}, "/var/lib/dhcp/dhclient6.eth1.leases", true);
+    client.pid = 17;
+    const ClientFacts facts = read({client});
+    ASSERT_EQ(facts.leases.size(), 1U);
+    const Lease& lease = facts.leases[0];
+    EXPECT_EQ(lease.obtained, 1795216181);
+    EXPECT_EQ(lease.renews, 1795216481);
+    EXPECT_EQ(lease.rebinds, 1795216706);
+    EXPECT_EQ(lease.expires, 1795216781);
+    EXPECT_THAT(lease.options, testing::Contains(23));
+    EXPECT_TRUE(lease.clientIdentifier.starts_with("0:1:0:1:")) << lease.clientIdentifier;
+    EXPECT_EQ(lease.pid, 17);
+    EXPECT_EQ(read().leases.at(0).pid, 0);
+}
+
+TEST_F(DhclientTest, AFileThatOthersMayWriteIsNotBelieved) {
+    const std::string file = "/var/lib/dhcp/dhclient.leases";
+    root_.write(file, lease("eth1", "192.0.2.7", "192.0.2.1"));
+    ASSERT_EQ(::chmod(root_.path("").c_str(), 0755), 0);
+    ASSERT_EQ(::chmod(root_.path("/var/lib/dhcp").c_str(), 0777), 0);
+    const ClientFacts facts = read({process({"eth1"_name}, file)});
+    EXPECT_THAT(facts.leases, IsEmpty());
+    const Diagnostic expected{
+        root_.path(file) + " is not trusted: every user may change " + root_.path("/var/lib/dhcp"),
+        Diagnostic::Kind::Untrusted};
+    EXPECT_THAT(facts.diagnostics, testing::Each(expected));
+    EXPECT_FALSE(facts.diagnostics.empty());
+    ASSERT_EQ(::chmod(root_.path("/var/lib/dhcp").c_str(), 0755), 0);
+    EXPECT_EQ(read().leases.size(), 1U);
+}
+
+TEST_F(DhclientTest, OnlyTheUserOfItsClientMayOwnAFile) {
+    if (::geteuid() != 0) {
+        GTEST_SKIP() << "giving files away needs root";
+    }
+    constexpr uid_t nobody = 65534;
+    const std::string file = "/var/lib/dhcp/dhclient.leases";
+    root_.write(file, lease("eth1", "192.0.2.7", "192.0.2.1"));
+    ASSERT_EQ(::chmod(root_.path("").c_str(), 0755), 0);
+    ASSERT_EQ(::chown(root_.path(file).c_str(), nobody, nobody), 0);
     EXPECT_THAT(read().leases, IsEmpty());
+    ClientProcess client = process({"eth1"_name});
+    EXPECT_THAT(read({client}).leases, IsEmpty());
+    client.user = nobody;
+    const ClientFacts facts = read({client});
+    EXPECT_EQ(facts.leases.size(), 1U);
+    EXPECT_THAT(facts.diagnostics, IsEmpty());
+}
+
+TEST_F(DhclientTest, WhatALinkLeadsToIsWatched) {
+    root_.write("/srv/own.db", lease("eth1", "192.0.2.7", "192.0.2.1"));
+    std::filesystem::create_directories(root_.path("/var/lib/dhcp"));
+    ASSERT_EQ(::symlink("../../../srv/own.db", root_.path("/var/lib/dhcp/dhclient.leases").c_str()),
+              0);
+    const ClientFacts facts = read();
+    EXPECT_EQ(facts.leases.size(), 1U);
+    EXPECT_EQ(facts.leases.at(0).origin, root_.path("/var/lib/dhcp/dhclient.leases"));
+    EXPECT_EQ(
+        facts.places,
+        (std::vector<WatchedPlace>{{.directory = root_.path("/srv"), .namePrefix = "own.db"}}));
 }
 
 TEST_F(DhclientTest, TheFileOfARunningClientIsReadWhereverItLies) {
@@ -229,10 +333,114 @@ TEST_F(DhclientTest, OnlyTheClientThatKeepsTheFileIsBehindItsLeases) {
     EXPECT_THAT(alive({process({}, "", true)}), ElementsAre(false, false));
 }
 
-TEST_F(DhclientTest, ALeaseFileNamedRelativelyIsNotGuessed) {
-    const ClientFacts facts = read({process({"eth1"_name}, "own.db")});
+/// A relative file name, of a process of which this process file system tells.
+class RelativeDhclientTest : public DhclientTest {
+  protected:
+    RelativeDhclientTest() {
+        root_.write("/work/own.db", lease("eth1", "192.0.2.7", "192.0.2.1"));
+        std::filesystem::create_directories(root_.path("/proc/17"));
+    }
+    void link(const std::string& name, const std::string& target) const {
+        std::filesystem::create_symlink(target, root_.path("/proc/17/" + name));
+    }
+    ClientFacts readOf(const std::string& leaseFile) const {
+        ClientFacts facts;
+        facts.processes = {process({"eth1"_name}, leaseFile)};
+        facts.processes[0].pid = 17;
+        readDhclient({.files = "", .proc = root_.path("/proc")}, facts);
+        // What the machine itself has is not of this test.
+        std::erase_if(facts.leases, [](const Lease& lease) { return lease.pid == 0; });
+        return facts;
+    }
+};
+
+TEST_F(RelativeDhclientTest, BeginsInTheWorkingDirectory) {
+    link("cwd", root_.path("/work"));
+    for (const char* name : {"own.db", "./own.db", "../work/own.db"}) {
+        const ClientFacts facts = readOf(name);
+        ASSERT_EQ(facts.leases.size(), 1U) << name;
+        EXPECT_TRUE(facts.leases[0].clientAlive);
+        EXPECT_EQ(facts.leases[0].origin, root_.path("/work/") + name);
+    }
+    EXPECT_THAT(
+        readOf("own.db").places,
+        testing::Contains(WatchedPlace{.directory = root_.path("/work"), .namePrefix = "own.db"}));
+}
+
+TEST_F(RelativeDhclientTest, OfAProcessThatHasEndedNothingIsKnown) {
+    std::filesystem::remove_all(root_.path("/proc/17"));
+    const ClientFacts facts = readOf("own.db");
     EXPECT_THAT(facts.leases, IsEmpty());
     EXPECT_THAT(facts.places, IsEmpty());
+}
+
+TEST_F(RelativeDhclientTest, ADirectoryThatIsGoneIsToldAndNotGuessed) {
+    link("cwd", root_.path("/work (deleted)"));
+    const ClientFacts facts = readOf("own.db");
+    EXPECT_THAT(facts.leases, IsEmpty());
+    EXPECT_THAT(
+        facts.diagnostics,
+        testing::Contains(Diagnostic{
+            "cannot tell where process 17 (dhclient) keeps own.db: No such file or directory",
+            Diagnostic::Kind::Unreadable}));
+}
+
+TEST_F(RelativeDhclientTest, BeginsBelowTheRootOfTheProcess) {
+    // As of a process that changed its root to another one and works in its /work.
+    root_.write("/jail/work/own.db", lease("eth1", "192.0.2.7", "192.0.2.2"));
+    root_.write("/jail/etc/whole.db", lease("eth1", "192.0.2.7", "192.0.2.3"));
+    link("root", root_.path("/jail"));
+    link("cwd", root_.path("/jail/work"));
+    EXPECT_THAT(servers(readOf("own.db")), ElementsAre("192.0.2.2"_ip));
+    EXPECT_THAT(servers(readOf("/etc/whole.db")), ElementsAre("192.0.2.3"_ip));
+}
+
+TEST(DhclientProcessFiles, OfARealKernel) {
+    ZR_NEEDS_NAMESPACES();
+    EXPECT_TRUE(passesInNamespaces(30, [] {
+        run("mkdir -p /run/jail/work /run/work && echo here > /run/work/own.db && "
+            "echo jailed > /run/jail/work/own.db && ln -s /work/own.db /run/jail/work/link.db");
+        const auto contentFor = [](const char* root, const char* directory, const char* path,
+                                   int kinds) {
+            std::array<int, 2> ready{};
+            EXPECT_EQ(::pipe(ready.data()), 0);
+            const pid_t child = ::fork();
+            if (child == 0) {
+                const bool done = ::unshare(kinds) == 0 && ::chroot(root) == 0 &&
+                                  ::chdir(directory) == 0 && ::write(ready[1], "y", 1) == 1;
+                for (; done;) {
+                    ::pause();
+                }
+                ::_exit(1);
+            }
+            ::close(ready[1]);
+            char done = 'n';
+            EXPECT_EQ(::read(ready[0], &done, 1), 1);
+            ::close(ready[0]);
+            ClientProcess client = process({}, path);
+            client.pid = child;
+            std::vector<Diagnostic> diagnostics;
+            const auto file = fileOfProcess({}, client, path, diagnostics);
+            std::string content = "not known";
+            if (file) {
+                const auto found = findFile(file->path, {}, diagnostics, file->root);
+                content = found ? File::read(found->path).value_or("unreadable") : "not found";
+                if (found && !found->doubt.empty()) {
+                    content = found->doubt;
+                }
+            }
+            ::kill(child, SIGKILL);
+            ::waitpid(child, nullptr, 0);
+            return content;
+        };
+        EXPECT_EQ(contentFor("/", "/run/work", "own.db", 0), "here\n");
+        EXPECT_EQ(contentFor("/run/jail", "/work", "own.db", 0), "jailed\n");
+        EXPECT_EQ(contentFor("/run/jail", "/work", "/work/own.db", 0), "jailed\n");
+        EXPECT_EQ(contentFor("/run/jail", "/work", "/work/link.db", 0), "jailed\n");
+        EXPECT_EQ(contentFor("/", "/run/work", "own.db", CLONE_NEWNS), "here\n");
+        EXPECT_EQ(contentFor("/", "/run/work", "/run/work/own.db", CLONE_NEWNS), "here\n");
+        EXPECT_EQ(contentFor("/", "/run/work", "none.db", 0), "not found");
+    }));
 }
 
 TEST_F(DhclientTest, AnythingButAFileIsReportedAndHangsNoReader) {

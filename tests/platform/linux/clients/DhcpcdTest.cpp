@@ -5,6 +5,7 @@
 #include <sys/socket.h>
 
 #include "LinuxSupport.h"
+#include "kit/Diagnostics.h"
 
 namespace ZR::Live {
 namespace {
@@ -33,7 +34,8 @@ TEST(DhcpcdArguments, ARunningOneSaysWhatItDoes) {
 TEST(DhcpcdArguments, ItsHelpersAreNotClients) {
     for (const char* title :
          {"dhcpcd: [privileged proxy] eth1 [ip4] [ip6]", "dhcpcd: [network proxy] 198.51.100.7",
-          "dhcpcd: [control proxy]", "dhcpcd: [BPF ARP] eth1 198.51.100.107", "dhcpcd: "}) {
+          "dhcpcd: [control proxy] eth1 [ip4]", "dhcpcd: [BPF ARP] eth1 198.51.100.107",
+          "dhcpcd: [BPF BOOTP] eth1", "dhcpcd: [launcher]", "dhcpcd: "}) {
         EXPECT_EQ(parse({title}), std::nullopt) << title;
     }
 }
@@ -47,7 +49,8 @@ TEST(DhcpcdArguments, BeforeItSaysSoItsArgumentsTell) {
 }
 
 TEST(DhcpcdArguments, ACommandToAnotherOneIsNotAClient) {
-    for (const char* command : {"-k", "-x", "-n", "-U", "--release", "--exit", "--dumplease"}) {
+    for (const char* command :
+         {"-k", "-x", "-n", "-U", "-T", "--release", "--exit", "--dumplease", "--test"}) {
         EXPECT_EQ(parse({"dhcpcd", command, "eth1"}), std::nullopt) << command;
     }
 }
@@ -78,6 +81,10 @@ class DhcpcdTest : public testing::Test {
                 .address = "198.51.100.121"_ip,
                 .server = "198.51.100.1"_ip,
                 .expires = 1'795'216'600,
+                .obtained = 1'795'216'000,
+                .renews = 1'795'216'300,
+                .rebinds = 1'795'216'525,
+                .options = {53, 54, 51, 58, 59, 1, 28, 12, 15, 42, 6, 3},
                 .origin = root_.path(file)};
     }
 
@@ -101,6 +108,11 @@ TEST_F(DhcpcdTest, ALeaseOfIPv6NamesNoServer) {
                                   .address = "2001:db8:99::100"_ip,
                                   .server = {},
                                   .expires = 1'795'216'600,
+                                  .obtained = 1'795'216'000,
+                                  .renews = 1'795'216'300,
+                                  .rebinds = 1'795'216'525,
+                                  .options = {1, 2, 3, 13, 23, 39},
+                                  .clientIdentifier = "00:01:00:01:32:93:91:cc:52:54:00:00:00:10",
                                   .origin = root_.path("/var/lib/dhcpcd/eth1.lease6")}));
 }
 
@@ -114,7 +126,7 @@ TEST_F(DhcpcdTest, AllItsPlacesAreRead) {
     EXPECT_THAT(read().leases, ElementsAre(lease("/var/lib/dhcpcd/eth1.lease"),
                                            lease("/var/lib/dhcpcd5/dhcpcd-eth1.lease"),
                                            lease("/var/db/dhcpcd/eth1.lease")));
-    EXPECT_THAT(read().diagnostics, IsEmpty());
+    EXPECT_THAT(ZR::Testing::textsOf(read().diagnostics), IsEmpty());
 }
 
 TEST_F(DhcpcdTest, ARunningOneOfTheLinkOrOfAllKeepsTheLease) {
@@ -149,7 +161,7 @@ TEST_F(DhcpcdTest, AReplyWithoutALeaseTimeIsNotALease) {
         sample("dhcpcd-10/eth1.lease").substr(0, 240) + std::string{"\x35\x01\x05\xff"};
     write("/var/lib/dhcpcd/eth1.lease", inform);
     EXPECT_THAT(read().leases, IsEmpty());
-    EXPECT_THAT(read().diagnostics, IsEmpty());
+    EXPECT_THAT(ZR::Testing::textsOf(read().diagnostics), IsEmpty());
 }
 
 TEST_F(DhcpcdTest, AnEmptyFileIsJustBeingWritten) {
@@ -161,10 +173,11 @@ TEST_F(DhcpcdTest, AFileThatIsNotAPacketIsReported) {
     write("/var/lib/dhcpcd/eth1.lease", "text");
     write("/var/lib/dhcpcd/eth1.lease6", "text");
     EXPECT_THAT(read().leases, IsEmpty());
-    EXPECT_THAT(read().diagnostics,
+    EXPECT_THAT(ZR::Testing::textsOf(read().diagnostics),
                 ElementsAre("cannot use " + root_.path("/var/lib/dhcpcd/eth1.lease") +
                                 ": shorter than a DHCP message",
                             HasSubstr("not a reply of a server")));
+    EXPECT_EQ(read().diagnostics.at(0).kind, Diagnostic::Kind::Damaged);
 }
 
 TEST_F(DhcpcdTest, AWirelessLeaseIsClaimedForEachPossibleInterface) {
@@ -174,6 +187,195 @@ TEST_F(DhcpcdTest, AWirelessLeaseIsClaimedForEachPossibleInterface) {
         names.push_back(found.interfaceName);
     }
     EXPECT_THAT(names, ElementsAre("wlan0-Net"_name, "wlan0"_name));
+}
+
+/// A machine on which dhcpcd runs, as its processes and its file say.
+class RunningDhcpcdTest : public DhcpcdTest {
+  protected:
+    static constexpr const char* leaseFile = "/var/lib/dhcpcd/eth1.lease";
+    static constexpr const char* ofLease = "198.51.100.121";
+
+    /// A main process 7 with a proxy 8 and its helpers from 9 on.
+    void run(const std::string& main, const std::vector<std::string>& helpers = {}) const {
+        add(7, 1, "dhcpcd: " + main, "8 ");
+        std::string children;
+        int pid = 9;
+        for (const std::string& helper : helpers) {
+            children += std::to_string(pid) + ' ';
+            add(pid++, 8, "dhcpcd: " + helper, "");
+        }
+        add(8, 7, "dhcpcd: [privileged proxy]", children);
+    }
+    void configure(const std::string& text) const { root_.write("/etc/dhcpcd.conf", text); }
+    void lease() const { write(leaseFile, sample("dhcpcd-10/eth1.lease")); }
+
+    /// The facts when that main process, and no other, was found to run.
+    [[nodiscard]] ClientFacts seen(ClientProcess found) const {
+        found.pid = 7;
+        return read({std::move(found)});
+    }
+    [[nodiscard]] ClientFacts named() const { return seen(process({"eth1"_name})); }
+    [[nodiscard]] ClientFacts ofAll() const { return seen(process({})); }
+
+    /// "4", "6" or both: under which protocols a link of the facts is.
+    static std::string protocols(const ClientFacts& facts) {
+        std::string found;
+        for (const ClientProcess& process : facts.processes) {
+            EXPECT_THAT(process.interfaces, ElementsAre("eth1"_name));
+            EXPECT_EQ(process.pid, 7);
+            found += process.ipv6 ? '6' : '4';
+        }
+        return found;
+    }
+    /// The address that it was told, with "inform" where it asks for the rest.
+    static std::string told(const ClientFacts& facts) {
+        if (facts.managements.size() != 1) {
+            return std::to_string(facts.managements.size()) + " managements";
+        }
+        const LinkConfiguration& found = facts.managements.front();
+        EXPECT_EQ(found.client, Client::Dhcpcd);
+        EXPECT_EQ(found.interfaceName, "eth1"_name);
+        EXPECT_EQ(found.staticAddresses.size(), 1U);
+        return found.staticAddresses.front().text() + (found.dhcp4 == true ? " inform" : "");
+    }
+
+  private:
+    void add(int pid, int parent, const std::string& title, const std::string& children) const {
+        const std::string place = "/proc/" + std::to_string(pid);
+        root_.write(place + "/cmdline", title + std::string(20, '\0'));
+        root_.write(place + "/status",
+                    "Name:\tdhcpcd\nPPid:\t" + std::to_string(parent) + "\nUid:\t0\n");
+        root_.write(place + "/task/" + std::to_string(pid) + "/children", children);
+    }
+};
+
+TEST_F(RunningDhcpcdTest, OneOfALinkHasItUnderDhcpFromItsStart) {
+    run("eth1 [ip4]");
+    EXPECT_EQ(protocols(named()), "4");
+    run("eth1 [ip4] [ip6]");
+    EXPECT_EQ(protocols(named()), "4");
+    run("eth1 [ip6]");
+    EXPECT_EQ(protocols(seen(process({"eth1"_name}, true))), "6");
+}
+
+TEST_F(RunningDhcpcdTest, BesideDhcpV4OnlyALeaseShowsThatDhcpV6IsUsed) {
+    write("/var/lib/dhcpcd/eth1.lease6", sample("dhcpcd-10/eth1.lease6"));
+    run("eth1 [ip4] [ip6]");
+    EXPECT_EQ(protocols(named()), "46");
+    EXPECT_TRUE(named().leases.at(0).clientAlive);
+    EXPECT_EQ(named().leases.at(0).pid, 7);
+    run("eth1 [ip4]");
+    EXPECT_EQ(protocols(named()), "4");
+    EXPECT_FALSE(named().leases.at(0).clientAlive);
+    run("eth1 [ip4] [ip6]");
+    configure("nodhcp6\n");
+    EXPECT_EQ(protocols(named()), "4");
+}
+
+TEST_F(RunningDhcpcdTest, OneOfAllLinksHasThoseWhereItAsksOrHasLeases) {
+    run("[manager] [ip4] [ip6]");
+    EXPECT_EQ(protocols(ofAll()), "");
+    run("[manager] [ip4] [ip6]", {"[network proxy]", "[BPF BOOTP] eth1"});
+    EXPECT_EQ(protocols(ofAll()), "4");
+    run("[manager] [ip4] [ip6]");
+    lease();  // the cable may be out
+    EXPECT_EQ(protocols(ofAll()), "4");
+    EXPECT_TRUE(ofAll().leases.at(0).clientAlive);
+}
+
+TEST_F(RunningDhcpcdTest, WhatIsLeftOfItWhenItAsksNowhereIsAManager) {
+    run("[manager] [ip4] [ip6]");
+    EXPECT_THAT(ofAll().managers,
+                ElementsAre(ManagerProcess{
+                    .client = Client::Dhcpcd, .where = ManagerProcess::Where::Here, .pid = 7}));
+}
+
+TEST_F(RunningDhcpcdTest, AnAddressThatNoServerGaveItWasTold) {
+    // As with -S on its command line, of which nothing is left.
+    run("eth1 [ip4]", {"[BPF ARP] eth1 198.51.100.9"});
+    EXPECT_EQ(protocols(named()), "");
+    EXPECT_EQ(told(named()), "198.51.100.9");
+    lease();  // of former days
+    EXPECT_EQ(protocols(named()), "");
+    EXPECT_FALSE(named().leases.at(0).clientAlive);
+    run("[manager] [ip4]", {"[BPF ARP] eth1 198.51.100.9"});
+    EXPECT_EQ(protocols(ofAll()), "");
+    EXPECT_EQ(told(ofAll()), "198.51.100.9");
+}
+
+TEST_F(RunningDhcpcdTest, TheAddressOfALeaseWasNotTold) {
+    lease();
+    run("eth1 [ip4]", {std::string{"[BPF ARP] eth1 "} + ofLease});
+    EXPECT_EQ(protocols(named()), "4");
+    EXPECT_THAT(named().managements, IsEmpty());
+    configure("interface eth1\nstatic ip_address=198.51.100.9/24\n");  // and not read again
+    EXPECT_EQ(protocols(named()), "4");
+}
+
+TEST_F(RunningDhcpcdTest, WhileItAsksAnAddressOfTheLinkAloneTellsNothing) {
+    run("eth1 [ip4]", {"[BPF ARP] eth1 169.254.3.7"});
+    EXPECT_EQ(protocols(named()), "4");
+    run("eth1 [ip4]", {"[BPF ARP] eth1 198.51.100.9", "[BPF BOOTP] eth1"});
+    EXPECT_EQ(protocols(named()), "4");
+}
+
+TEST_F(RunningDhcpcdTest, OneThatInformsHasAnAddressThatItWasTold) {
+    run("eth1 [ip4]", {"[BPF ARP] eth1 198.51.100.9", "[network proxy] 198.51.100.9"});
+    EXPECT_EQ(protocols(named()), "4");
+    EXPECT_EQ(told(named()), "198.51.100.9 inform");
+    configure("inform 198.51.100.9/24\n");
+    run("[manager] [ip4]", {"[BPF ARP] eth1 198.51.100.9"});
+    EXPECT_EQ(protocols(ofAll()), "4");
+    EXPECT_EQ(told(ofAll()), "198.51.100.9 inform");
+}
+
+TEST_F(RunningDhcpcdTest, ItsFileKeepsLinksOutOfDhcp) {
+    lease();  // of former days
+    run("[manager] [ip4] [ip6]");
+    for (const char* text :
+         {"denyinterfaces wlan0 eth*\n", "allowinterfaces wlan*\n", "nodhcp\n", "noipv4\n",
+          "ipv6only\n", "interface eth1\nstatic ip_address=198.51.100.9/24\n"}) {
+        configure(text);
+        EXPECT_EQ(protocols(ofAll()), "") << text;
+    }
+    for (const char* text : {"denyinterfaces eth2\n", "allowinterfaces eth1,eth2\n",
+                             "interface eth2\nstatic ip_address=198.51.100.9/24\n", ""}) {
+        configure(text);
+        EXPECT_EQ(protocols(ofAll()), "4") << text;
+    }
+    EXPECT_THAT(ofAll().places, testing::Contains(WatchedPlace{root_.path("/etc"), "dhcpcd.conf"}));
+}
+
+TEST_F(RunningDhcpcdTest, AFileWrittenSinceItsStartIsNotTakenForApplied) {
+    run("eth1 [ip4]");
+    configure("interface eth1\nstatic ip_address=198.51.100.9/24\n");
+    root_.write("/run/dhcpcd/eth1-4.pid", "7\n");
+    root_.age("/run/dhcpcd/eth1-4.pid", 2'000);
+    root_.age("/etc/dhcpcd.conf", 1'000);
+    EXPECT_EQ(protocols(named()), "");
+    root_.age("/etc/dhcpcd.conf", 3'000);
+    EXPECT_EQ(protocols(named()), "4");
+}
+
+TEST_F(RunningDhcpcdTest, BeforeItHasATitleItsCommandLineTells) {
+    const auto started = [&](const std::string& line) {
+        root_.write("/proc/7/cmdline", line);
+        return protocols(named());
+    };
+    using namespace std::string_literals;
+    EXPECT_EQ(started("dhcpcd\0eth1\0"s), "4");
+    EXPECT_EQ(started("dhcpcd\0-S\0ip_address=198.51.100.9/24\0eth1\0"s), "");
+    EXPECT_EQ(started("dhcpcd\0--nodhcp\0eth1\0"s), "");
+    EXPECT_EQ(started("dhcpcd\0-Z\0eth1\0eth1\0"s), "");
+    EXPECT_EQ(started("dhcpcd\0-f\0/etc/other.conf\0eth1\0"s), "4");
+    root_.write("/etc/other.conf", "nodhcp\n");
+    EXPECT_EQ(started("dhcpcd\0-f\0/etc/other.conf\0eth1\0"s), "");
+}
+
+TEST_F(RunningDhcpcdTest, WithoutItsHelpersOneOfAllLinksStaysOne) {
+    root_.write("/proc/7/cmdline", "dhcpcd: [manager] [ip4]");
+    EXPECT_THAT(ofAll().processes, testing::SizeIs(1));
+    EXPECT_THAT(ofAll().processes.at(0).interfaces, IsEmpty());
 }
 
 }  // namespace

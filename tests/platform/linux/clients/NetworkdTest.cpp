@@ -5,6 +5,7 @@
 #include <unistd.h>
 
 #include "LinuxSupport.h"
+#include "kit/Diagnostics.h"
 
 namespace ZR::Live {
 namespace {
@@ -72,7 +73,7 @@ TEST_F(NetworkdTest, AsItWasCaptured) {
                                    .clientAlive = true,
                                    .expires = std::nullopt,
                                    .origin = root_.path("/run/systemd/netif/leases/2")}}));
-    EXPECT_THAT(facts.diagnostics, IsEmpty());
+    EXPECT_THAT(ZR::Testing::textsOf(facts.diagnostics), IsEmpty());
 }
 
 TEST_F(NetworkdTest, WhereItRunsForOtherLinksItsIndexesAreTheirs) {

@@ -4,11 +4,22 @@
 #include "clients/Processes.h"
 
 #include <gmock/gmock.h>
+#include <grp.h>
 #include <gtest/gtest.h>
+#include <linux/capability.h>
+#include <sys/prctl.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
+#include <csignal>
+#include <iomanip>
+#include <sstream>
+
 #include "LinuxSupport.h"
+#include "clients/ProcessStatus.h"
 #include "kit/ChildProcess.h"
+#include "kit/Diagnostics.h"
+#include "kit/Namespaces.h"
 
 namespace ZR::Live {
 namespace {
@@ -24,10 +35,20 @@ class ProcessesTest : public testing::Test {
         std::filesystem::create_directories(proc_.path("/" + process + "/ns"));
         std::filesystem::create_symlink(name, proc_.path("/" + process + "/ns/net"));
     }
+    static std::string status(char state, unsigned realUser, unsigned user,
+                              std::uint64_t capabilities, int parent = 1) {
+        std::ostringstream text;
+        text << "Name:\tx\nUmask:\t0022\nState:\t" << state << " (sleeping)\nTgid:\t7\nPPid:\t"
+             << parent << "\nUid:\t" << realUser << '\t' << user << '\t' << user << '\t' << user
+             << "\nCapEff:\t" << std::hex << std::setfill('0') << std::setw(16) << capabilities
+             << "\n";
+        return text.str();
+    }
     void add(const std::string& process, const std::string& name, const std::string& commandLine,
              const char* networkNamespace = "net:[1]") const {
         proc_.write("/" + process + "/comm", name + "\n");
         proc_.write("/" + process + "/cmdline", commandLine);
+        proc_.write("/" + process + "/status", status('S', 0, 0, 0));
         if (networkNamespace != nullptr) {
             linkNamespace(process, networkNamespace);
         }
@@ -61,7 +82,7 @@ TEST_F(ProcessesTest, ClientsOfOtherNamespacesConcernOtherLinks) {
 TEST_F(ProcessesTest, AClientOfAnUnknownNamespaceIsNotTrusted) {
     add("17", "dhclient", commandLine_, nullptr);
     EXPECT_THAT(read().processes, IsEmpty());
-    EXPECT_THAT(read().diagnostics, IsEmpty());
+    EXPECT_THAT(ZR::Testing::textsOf(read().diagnostics), IsEmpty());
 }
 
 TEST_F(ProcessesTest, WithoutAnOwnNamespaceNoClientIsTrusted) {
@@ -127,8 +148,8 @@ TEST_F(ProcessesTest, AClientWhoseNamespaceIsForbiddenIsReported) {
         }
         const ClientFacts facts = read();
         std::string text = std::to_string(facts.processes.size()) + " processes";
-        for (const std::string& diagnostic : facts.diagnostics) {
-            text += "; " + diagnostic;
+        for (const Diagnostic& diagnostic : facts.diagnostics) {
+            text += "; " + diagnostic.text;
         }
         return text;
     });
@@ -183,10 +204,303 @@ TEST_F(ProcessesTest, AnyListOfThreadsOfTheKernelIsRead) {
     }
 }
 
+TEST(ProcessStatus, CapturedOfARealKernel) {
+    const auto status = parseProcessStatus(File::read("/proc/self/status").value());
+    ASSERT_TRUE(status);
+    EXPECT_EQ(status->state, 'R');
+    EXPECT_EQ(status->parent, ::getppid());
+    EXPECT_EQ(status->realUser, ::getuid());
+    EXPECT_EQ(status->user, ::geteuid());
+    EXPECT_FALSE(status->hasEnded());
+}
+
+TEST(ProcessStatus, WhatIsMissingIsNotGuessed) {
+    EXPECT_EQ(parseProcessStatus("State:\tZ (zombie)\nUid:\t1\t2\t3\t4\n"),
+              (ProcessStatus{.state = 'Z', .parent = 0, .realUser = 1, .user = 2}));
+    for (const char* text :
+         {"", "State:\tS\n", "Uid:\t1\t2\t3\t4\n", "State:\nUid:\t1\t2\n", "State:\tS\nUid:\t1\n",
+          "State:\tS\nUid:\tx\t2\n", "State:\tS\nUid:\t1\t4294967296\n"}) {
+        EXPECT_EQ(parseProcessStatus(text), std::nullopt) << text;
+    }
+}
+
+TEST_F(ProcessesTest, WhatHasEndedIsNotAClientWhateverItsNameAndArguments) {
+    add("17", "dhclient", commandLine_);
+    add("18", "NetworkManager", "");
+    for (const char state : {'Z', 'X'}) {
+        proc_.write("/17/status", status(state, 0, 0, 0));
+        proc_.write("/18/status", status(state, 0, 0, 0));
+        EXPECT_EQ(read(), ClientFacts{});
+    }
+}
+
+TEST_F(ProcessesTest, AClientOfAnotherUserIsNotTrusted) {
+    add("17", "dhclient", commandLine_);
+    add("18", "NetworkManager", "");
+    proc_.write("/17/status", status('S', 1000, 1000, 0));
+    proc_.write("/18/status", status('S', 1000, 1000, 0));
+    const ClientFacts facts = read();
+    EXPECT_THAT(facts.processes, IsEmpty());
+    EXPECT_THAT(facts.managers, IsEmpty());
+    EXPECT_THAT(facts.hiddenClients, IsEmpty());
+    EXPECT_THAT(facts.diagnostics,
+                testing::UnorderedElementsAre(
+                    Diagnostic{"process 17 (dhclient) is not trusted: user 1000 may not open the "
+                               "sockets of a DHCP client",
+                               Diagnostic::Kind::Untrusted},
+                    Diagnostic{"process 18 (NetworkManager) is not trusted: user 1000 may not "
+                               "open the sockets of a DHCP client",
+                               Diagnostic::Kind::Untrusted}));
+}
+
+TEST_F(ProcessesTest, AForgedClientOfAnotherNamespaceIsNotWorthAWord) {
+    add("17", "dhclient", commandLine_, "net:[2]");
+    add("18", "NetworkManager", "", "net:[2]");
+    proc_.write("/17/status", status('S', 1000, 1000, 0));
+    proc_.write("/18/status", status('S', 1000, 1000, 0));
+    EXPECT_EQ(read(), ClientFacts{});
+}
+
+TEST_F(ProcessesTest, ACapabilityCountsInOurOwnUserNamespaceOnly) {
+    add("17", "dhclient", commandLine_);
+    const auto found = [this] { return read().processes.size(); };
+    const auto userNamespace = [this](const char* process, const char* name) {
+        const std::string link = proc_.path(std::string{"/"} + process + "/ns/user");
+        std::filesystem::remove(link);
+        std::filesystem::create_symlink(name, link);
+    };
+    for (const int capability : {CAP_NET_RAW, CAP_NET_BIND_SERVICE, CAP_NET_ADMIN}) {
+        proc_.write("/17/status", status('S', 1000, 1000, std::uint64_t{1} << capability));
+        userNamespace("thread-self", "user:[1]");
+        userNamespace("17", "user:[1]");
+        EXPECT_EQ(found(), 1U);
+        userNamespace("17", "user:[2]");
+        EXPECT_EQ(found(), 0U);
+        // Who may not read that reads which users there are.
+        std::filesystem::remove(proc_.path("/17/ns/user"));
+        EXPECT_EQ(found(), 0U);
+        proc_.write("/thread-self/uid_map", "         0          0 4294967295\n");
+        proc_.write("/17/uid_map", "         0       1000          1\n");
+        EXPECT_EQ(found(), 0U);
+        proc_.write("/17/uid_map", "         0          0 4294967295\n");
+        EXPECT_EQ(found(), 1U);
+        proc_.write("/17/uid_map", "");
+        proc_.write("/thread-self/uid_map", "");
+        EXPECT_EQ(found(), 0U);
+    }
+    userNamespace("17", "user:[1]");
+    proc_.write("/17/status", status('S', 1000, 1000, std::uint64_t{1} << CAP_SYS_TIME));
+    EXPECT_EQ(found(), 0U);
+}
+
+TEST_F(ProcessesTest, AProgramThatLendsItsRightsIsNotAClient) {
+    add("17", "dhclient", commandLine_);
+    proc_.write("/17/status", status('S', 1000, 0, ~std::uint64_t{0}));
+    EXPECT_THAT(read().processes, IsEmpty());
+    EXPECT_THAT(ZR::Testing::textsOf(read().diagnostics),
+                ElementsAre("process 17 (dhclient) is not trusted: every user may start its "
+                            "program, which is set-user-ID"));
+    proc_.write("/17/status", status('S', 0, 0, 0));
+    EXPECT_EQ(read().processes.size(), 1U);
+    proc_.write("/17/exe", "");
+    ASSERT_EQ(::chmod(proc_.path("/17/exe").c_str(), 04755), 0);
+    EXPECT_THAT(read().processes, IsEmpty());
+}
+
+TEST_F(ProcessesTest, AProgramWithACapabilityIsTheClientItIsNamedAfter) {
+    add("17", "dhclient", commandLine_);
+    proc_.write("/17/status", status('S', 1000, 1000, std::uint64_t{1} << CAP_NET_RAW));
+    for (const char* process : {"17", "thread-self"}) {
+        std::filesystem::create_symlink("user:[1]",
+                                        proc_.path(std::string{"/"} + process + "/ns/user"));
+    }
+    const auto found = [this](const char* program) {
+        std::filesystem::remove(proc_.path("/17/exe"));
+        std::filesystem::create_symlink(program, proc_.path("/17/exe"));
+        return read().processes.size();
+    };
+    EXPECT_EQ(found("/usr/bin/ping"), 0U);
+    EXPECT_EQ(found("/usr/sbin/dhclient"), 1U);
+    EXPECT_EQ(found("/usr/sbin/dhclient (deleted)"), 1U);
+    EXPECT_EQ(found("/bin/busybox"), 1U);
+}
+
+TEST_F(ProcessesTest, DhcpcdKeepsItsRightsInAnotherProcess) {
+    add("20", "dhcpcd", "dhcpcd: eth1 [ip4] [ip6]");
+    add("21", "dhcpcd", "dhcpcd: [privileged proxy] eth1 [ip4] [ip6]");
+    proc_.write("/20/status", status('S', 102, 102, 0));
+    proc_.write("/21/status", status('S', 0, 0, 0, 20));
+    const ClientFacts facts = read();
+    ASSERT_EQ(facts.processes.size(), 1U);
+    EXPECT_EQ(facts.processes[0].pid, 20);
+    EXPECT_EQ(facts.processes[0].user, 102U);
+    EXPECT_THAT(ZR::Testing::textsOf(facts.diagnostics), IsEmpty());
+    // Another one of root has nothing to do with it.
+    proc_.write("/21/status", status('S', 0, 0, 0, 1));
+    EXPECT_THAT(read().processes, IsEmpty());
+    // Only dhcpcd does so.
+    proc_.write("/20/comm", "dhclient\n");
+    proc_.write("/21/status", status('S', 0, 0, 0, 20));
+    EXPECT_THAT(read().processes, IsEmpty());
+}
+
+TEST_F(ProcessesTest, ThePacketSocketsOfAClientNameItsLinks) {
+    proc_.write("/thread-self/net/packet",
+                "sk       RefCnt Type Proto  Iface R Rmem   User   Inode\n"
+                "0 3      3    0003   5     1 0      0      501\n"
+                "0 3      3    0003   6     1 0      0      502\n"
+                "0 3      3    0806   7     1 0      0      503\n"
+                "0 3      3    0003   8     1 0      0      504\n");
+    const auto open = [this](const char* process, const char* descriptor, const char* what) {
+        const std::string directory = proc_.path(std::string{"/"} + process + "/fd");
+        std::filesystem::create_directories(directory);
+        std::filesystem::create_symlink(what, directory + "/" + descriptor);
+    };
+    add("17", "dhclient", commandLine_);
+    EXPECT_EQ(read().processes.at(0).heardLinks, std::nullopt);
+    open("17", "0", "/dev/null");
+    open("17", "3", "socket:[501]");
+    open("17", "4", "socket:[503]");
+    open("17", "5", "socket:[999]");
+    open("17", "6", "socket:[501]");
+    EXPECT_EQ(read().processes.at(0).heardLinks, std::vector<std::uint32_t>{5});
+    std::filesystem::remove_all(proc_.path("/17"));
+
+    // Of dhcpcd each link is heard by a process of its own.
+    add("20", "dhcpcd", "dhcpcd: [manager] [ip4] [ip6]");
+    add("21", "dhcpcd", "dhcpcd: [privileged proxy]");
+    add("22", "dhcpcd", "dhcpcd: [BPF BOOTP] eth1");
+    add("23", "dhcpcd", "dhcpcd: [BPF ARP] eth2 192.0.2.1");
+    proc_.write("/21/status", status('S', 0, 0, 0, 20));
+    proc_.write("/22/status", status('S', 102, 102, 0, 21));
+    proc_.write("/23/status", status('S', 102, 102, 0, 21));
+    open("20", "3", "/dev/null");
+    open("21", "3", "/dev/null");
+    open("22", "3", "socket:[502]");
+    open("23", "3", "socket:[504]");
+    EXPECT_EQ(read().processes.at(0).heardLinks, std::vector<std::uint32_t>{6});
+}
+
+/// A copy of sleep(1) that has the name of a client, started by a shell command that says
+/// PROGRAM for it, and ended with the object.
+class Impostor {
+  public:
+    Impostor(const std::string& name, std::string command) : path_(directory_.path("/" + name)) {
+        run("chmod 755 " + directory_.path("") + " && cp /bin/sleep " + path_);
+        command.replace(command.find("PROGRAM"), 7, path_ + " infinity");
+        process_ = ::fork();
+        if (process_ == 0) {
+            ::execl("/bin/sh", "sh", "-c", ("exec " + command).c_str(), nullptr);
+            ::_exit(127);
+        }
+        for (int i = 0; i < 500 && nameNow() != name + "\n"; ++i) {
+            ::usleep(10'000);
+        }
+        EXPECT_EQ(nameNow(), name + "\n");
+    }
+    Impostor(const Impostor&) = delete;
+    Impostor& operator=(const Impostor&) = delete;
+    ~Impostor() {
+        ::kill(process_, SIGKILL);
+        ::waitpid(process_, nullptr, 0);
+    }
+
+    [[nodiscard]] pid_t process() const { return process_; }
+
+  private:
+    [[nodiscard]] std::string nameNow() const {
+        return File::read("/proc/" + std::to_string(process_) + "/comm").value_or("");
+    }
+
+    TemporaryDirectory directory_;
+    std::string path_;
+    pid_t process_ = -1;
+};
+
+std::size_t clientsFound() {
+    ClientFacts facts;
+    readProcesses({}, facts);
+    return facts.processes.size();
+}
+
+TEST(ForgedProcesses, OfARealKernel) {
+    ZR_NEEDS_NAMESPACES();
+    EXPECT_TRUE(passesInNamespaces(60, [] {
+        const std::string asNobody = "setpriv --reuid 65534 --regid 65534 --clear-groups ";
+        for (const char* name : {"udhcpc", "dhclient", "dhcpcd", "dhcp6c", "NetworkManager"}) {
+            const Impostor impostor{name, asNobody + "PROGRAM"};
+            ClientFacts facts;
+            readProcesses({}, facts);
+            EXPECT_THAT(facts.processes, IsEmpty()) << name;
+            EXPECT_THAT(facts.managers, IsEmpty()) << name;
+            ASSERT_EQ(facts.diagnostics.size(), 1U) << name;
+            EXPECT_EQ(facts.diagnostics[0].kind, Diagnostic::Kind::Untrusted) << name;
+        }
+        // Root of a user namespace has all capabilities there, and none here.
+        {
+            const Impostor impostor{"dhclient",
+                                    asNobody + "unshare --user --map-root-user PROGRAM"};
+            EXPECT_EQ(clientsFound(), 0U);
+        }
+        {
+            const Impostor real{"dhclient", "PROGRAM"};
+            EXPECT_EQ(clientsFound(), 1U);
+            ::kill(real.process(), SIGKILL);
+            siginfo_t ended{};
+            ASSERT_EQ(::waitid(P_PID, static_cast<id_t>(real.process()), &ended, WEXITED | WNOWAIT),
+                      0);
+            EXPECT_EQ(clientsFound(), 0U) << "it has ended and was not waited for";
+        }
+        const Impostor capable{
+            "dhclient",
+            "setpriv --reuid 65534 --regid 65534 --clear-groups --inh-caps +net_raw "
+            "--ambient-caps +net_raw PROGRAM"};
+        EXPECT_EQ(clientsFound(), 1U);
+    }));
+}
+
+TEST(HiddenProcesses, OfARealKernel) {
+    ZR_NEEDS_NAMESPACES();
+    EXPECT_TRUE(passesInNamespaces(60, [] {
+        const Impostor client{"dhclient", "PROGRAM"};
+        const auto asNobody = [] {
+            return ZR::Testing::inChild([] {
+                       if (::setgroups(0, nullptr) != 0 || ::setgid(65534) != 0 ||
+                           ::setuid(65534) != 0) {
+                           return std::string("cannot be another user");
+                       }
+                       ClientFacts facts;
+                       readProcesses({}, facts);
+                       std::ostringstream text;
+                       text << facts.processes.size() << " clients, " << facts.hiddenClients.size()
+                            << " hidden, " << (facts.processesHidden ? "more" : "no more");
+                       for (const Diagnostic& diagnostic : facts.diagnostics) {
+                           text << "; "
+                                << (diagnostic.kind == Diagnostic::Kind::Denied ? "" : "not ")
+                                << "denied: " << diagnostic.text;
+                       }
+                       return text.str();
+                   })
+                .output;
+        };
+        EXPECT_EQ(asNobody(),
+                  "0 clients, 1 hidden, no more; denied: cannot tell the links of "
+                  "process " +
+                      std::to_string(client.process()) + " (dhclient): Permission denied");
+        for (const char* option : {"2", "1"}) {
+            run(std::string{"mount -o remount,hidepid="} + option + " /proc");
+            EXPECT_EQ(asNobody(),
+                      "0 clients, 0 hidden, more; denied: /proc hides the processes of "
+                      "other users: a DHCP client among them is not seen");
+            EXPECT_EQ(clientsFound(), 1U) << "nothing is hidden from root";
+        }
+    }));
+}
+
 TEST_F(ProcessesTest, WithoutAProcessFileSystemThereIsAReason) {
     ClientFacts facts;
     readProcesses({.files = "", .proc = proc_.path("/none")}, facts);
-    EXPECT_THAT(facts.diagnostics,
+    EXPECT_THAT(ZR::Testing::textsOf(facts.diagnostics),
                 ElementsAre("cannot read " + proc_.path("/none") + ": No such file or directory"));
 }
 

@@ -8,6 +8,7 @@
 #include <sys/socket.h>
 
 #include "LinuxSupport.h"
+#include "kit/Diagnostics.h"
 
 namespace ZR::Live {
 namespace {
@@ -169,7 +170,8 @@ TEST_F(WickedTest, ATornFileIsReportedAndOthersAreNotLookedAt) {
     root_.write("/var/lib/wicked/lease--dhcp-ipv4.xml", lease4);
     root_.write("/var/lib/wicked/duid.xml", lease4);
     EXPECT_THAT(read().leases, IsEmpty());
-    EXPECT_THAT(read().diagnostics, ElementsAre(HasSubstr("the file ends within an element")));
+    EXPECT_THAT(ZR::Testing::textsOf(read().diagnostics),
+                ElementsAre(HasSubstr("the file ends within an element")));
 }
 
 }  // namespace

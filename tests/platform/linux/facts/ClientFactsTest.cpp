@@ -29,21 +29,6 @@ TEST(ClientFacts, AManagerOfAnotherNamespaceDoesNotRunHere) {
     EXPECT_FALSE(ClientFacts{}.runs(Client::Wicked));
 }
 
-TEST(ClientFacts, SocketsStandAloneWhereNoProgramThatCouldHaveThemIsSeen) {
-    ClientFacts facts;
-    EXPECT_FALSE(facts.socketsStandAlone());
-    facts.sockets.bound = {{.address = "192.0.2.7"_ip, .peer = {}}};
-    EXPECT_TRUE(facts.socketsStandAlone());
-    facts.managers = running(Client::Networkd, ManagerProcess::Where::Elsewhere).managers;
-    facts.processes = {{.client = Client::Dhcp6c, .interfaces = {}, .leaseFile = "", .ipv6 = true}};
-    EXPECT_TRUE(facts.socketsStandAlone());
-    facts.processes[0].ipv6 = false;
-    EXPECT_FALSE(facts.socketsStandAlone());
-    facts.processes.clear();
-    facts.managers = running(Client::Networkd).managers;
-    EXPECT_FALSE(facts.socketsStandAlone());
-}
-
 TEST(ClientFacts, AManagerRunsElsewhereWhereItRunsInNoOtherPlace) {
     using Where = ManagerProcess::Where;
     ClientFacts facts = running(Client::Wicked, Where::Elsewhere);

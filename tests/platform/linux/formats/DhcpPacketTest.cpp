@@ -47,17 +47,31 @@ const std::string server{"\xc0\x00\x02\x01", 4};
 const std::string tenMinutes{"\0\0\x02\x58", 4};
 
 TEST(DhcpReply, CapturedByVersion9) {
-    EXPECT_EQ(reply(sample("dhcpcd-9/eth1.lease")), (DhcpReply{.address = "198.51.100.107"_ip,
-                                                               .server = "198.51.100.1"_ip,
-                                                               .bootp = false,
-                                                               .leaseTime = 600}));
+    EXPECT_EQ(reply(sample("dhcpcd-9/eth1.lease")),
+              (DhcpReply{.address = "198.51.100.107"_ip,
+                         .server = "198.51.100.1"_ip,
+                         .bootp = false,
+                         .leaseTime = 600,
+                         .renewal = 300,
+                         .rebinding = 525,
+                         .options = {53, 54, 51, 58, 59, 1, 28, 15, 6, 3}}));
 }
 
 TEST(DhcpReply, CapturedByVersion10) {
-    EXPECT_EQ(reply(sample("dhcpcd-10/eth1.lease")), (DhcpReply{.address = "198.51.100.121"_ip,
-                                                                .server = "198.51.100.1"_ip,
-                                                                .bootp = false,
-                                                                .leaseTime = 600}));
+    EXPECT_EQ(reply(sample("dhcpcd-10/eth1.lease")),
+              (DhcpReply{.address = "198.51.100.121"_ip,
+                         .server = "198.51.100.1"_ip,
+                         .bootp = false,
+                         .leaseTime = 600,
+                         .renewal = 300,
+                         .rebinding = 525,
+                         .options = {53, 54, 51, 58, 59, 1, 28, 12, 15, 42, 6, 3}}));
+}
+
+TEST(DhcpReply, AServerMayRepeatWhoTheClientIs) {
+    const DhcpReply found = reply(packet(option(61, "\x01\x52\xff") + option(61, "\x0a") + end));
+    EXPECT_EQ(found.clientIdentifier, "01:52:ff:0a");
+    EXPECT_THAT(found.options, ElementsAre(61));
 }
 
 TEST(DhcpReply, EveryBeginningOfACapturedOneHasAReason) {
@@ -93,12 +107,16 @@ TEST(DhcpReply, WithoutAnEndItWasTorn) {
 TEST(DhcpReply, WithoutAMessageTypeItIsBootp) {
     EXPECT_EQ(reply(packet(end)),
               (DhcpReply{.address = "192.0.2.7"_ip, .server = {}, .bootp = true, .leaseTime = {}}));
+    EXPECT_THAT(reply(packet(end)).options, testing::IsEmpty());
 }
 
 TEST(DhcpReply, PaddingAndWhatFollowsTheEndDoNotCount) {
-    EXPECT_EQ(
-        reply(packet(std::string(3, '\0') + option(53, "\5") + end + option(54, server))),
-        (DhcpReply{.address = "192.0.2.7"_ip, .server = {}, .bootp = false, .leaseTime = {}}));
+    EXPECT_EQ(reply(packet(std::string(3, '\0') + option(53, "\5") + end + option(54, server))),
+              (DhcpReply{.address = "192.0.2.7"_ip,
+                         .server = {},
+                         .bootp = false,
+                         .leaseTime = {},
+                         .options = {53}}));
 }
 
 TEST(DhcpReply, OptionsMayGoOnInTheFileAndServerNameFields) {
@@ -107,7 +125,8 @@ TEST(DhcpReply, OptionsMayGoOnInTheFileAndServerNameFields) {
               (DhcpReply{.address = "192.0.2.7"_ip,
                          .server = "192.0.2.1"_ip,
                          .bootp = false,
-                         .leaseTime = 600}));
+                         .leaseTime = 600,
+                         .options = {53, 52, 54, 51}}));
     const std::string fileOnly = option(53, "\5") + option(52, "\1") + end;
     EXPECT_EQ(reply(packet(fileOnly, option(54, server) + end, option(51, tenMinutes))).leaseTime,
               std::nullopt);
@@ -160,15 +179,23 @@ std::string address6(const std::string& lifetime) {
 const std::string header6{"\7abc"};
 
 TEST(Dhcp6Reply, CapturedByVersion9) {
-    EXPECT_EQ(
-        reply6(sample("dhcpcd-9/eth1.lease6")),
-        (Dhcp6Reply{.addresses = {{.address = "2001:db8:99::142"_ip, .validLifetime = 600}}}));
+    EXPECT_EQ(reply6(sample("dhcpcd-9/eth1.lease6")),
+              (Dhcp6Reply{.addresses = {{.address = "2001:db8:99::142"_ip,
+                                         .validLifetime = 600,
+                                         .renewal = 300,
+                                         .rebinding = 525}},
+                          .options = {1, 2, 14, 3, 13, 7, 23},
+                          .clientIdentifier = "00:01:00:01:32:93:90:69:52:54:00:00:00:02"}));
 }
 
 TEST(Dhcp6Reply, CapturedByVersion10) {
-    EXPECT_EQ(
-        reply6(sample("dhcpcd-10/eth1.lease6")),
-        (Dhcp6Reply{.addresses = {{.address = "2001:db8:99::100"_ip, .validLifetime = 600}}}));
+    EXPECT_EQ(reply6(sample("dhcpcd-10/eth1.lease6")),
+              (Dhcp6Reply{.addresses = {{.address = "2001:db8:99::100"_ip,
+                                         .validLifetime = 600,
+                                         .renewal = 300,
+                                         .rebinding = 525}},
+                          .options = {1, 2, 3, 13, 23, 39},
+                          .clientIdentifier = "00:01:00:01:32:93:91:cc:52:54:00:00:00:10"}));
 }
 
 TEST(Dhcp6Reply, BeginningsEndBetweenOptionsOrAreRefused) {
@@ -193,12 +220,14 @@ TEST(Dhcp6Reply, AddressesOfBothKindsOfAssociationsCount) {
     const std::string ta = option6(4, std::string(4, '\0') + address6("\xff\xff\xff\xff"));
     EXPECT_EQ(reply6(header6 + na + ta),
               (Dhcp6Reply{.addresses = {{.address = "::1"_ip, .validLifetime = 3600},
-                                        {.address = "::1"_ip, .validLifetime = UINT32_MAX}}}));
+                                        {.address = "::1"_ip, .validLifetime = UINT32_MAX}},
+                          .options = {3, 4}}));
 }
 
 TEST(Dhcp6Reply, AnAddressWithoutALifetimeIsTakenBack) {
     const std::string none(4, '\0');
-    EXPECT_EQ(reply6(header6 + option6(3, std::string(12, '\0') + address6(none))), Dhcp6Reply{});
+    EXPECT_THAT(reply6(header6 + option6(3, std::string(12, '\0') + address6(none))).addresses,
+                testing::IsEmpty());
 }
 
 TEST(Dhcp6Reply, TooShortAssociationsAndAddressesAreRefused) {

@@ -6,6 +6,7 @@
 #include <unistd.h>
 
 #include "LinuxSupport.h"
+#include "kit/Diagnostics.h"
 
 namespace ZR::Live {
 namespace {
@@ -15,10 +16,10 @@ using testing::IsEmpty;
 
 TEST(Files, AbsentFilesAndDirectoriesGiveNoDiagnostic) {
     const TemporaryDirectory root;
-    std::vector<std::string> diagnostics;
+    std::vector<ZR::Diagnostic> diagnostics;
     EXPECT_EQ(readOptionalFile(root.path("/none"), diagnostics), std::nullopt);
     EXPECT_THAT(listOptionalDirectory(root.path("/none/there"), diagnostics), IsEmpty());
-    EXPECT_THAT(diagnostics, IsEmpty());
+    EXPECT_THAT(ZR::Testing::textsOf(diagnostics), IsEmpty());
 }
 
 TEST(Files, NamesAreSortedAndHalfWrittenFilesLeftOut) {
@@ -26,7 +27,7 @@ TEST(Files, NamesAreSortedAndHalfWrittenFilesLeftOut) {
     for (const char* name : {"/b", "/.#b1234", "/a"}) {
         root.write(name, "");
     }
-    std::vector<std::string> diagnostics;
+    std::vector<ZR::Diagnostic> diagnostics;
     EXPECT_THAT(listOptionalDirectory(root.path(), diagnostics), ElementsAre("a", "b"));
 }
 
@@ -42,14 +43,14 @@ TEST(Files, WhatMayNotBeReadIsADiagnostic) {
     if (user == 0) {  // who may read everything
         ASSERT_EQ(::seteuid(nobody), 0);
     }
-    std::vector<std::string> diagnostics;
+    std::vector<ZR::Diagnostic> diagnostics;
     const auto content = readOptionalFile(root.path("/file"), diagnostics);
     const auto names = listOptionalDirectory(root.path("/directory"), diagnostics);
     ASSERT_EQ(::seteuid(user), 0);
     ASSERT_EQ(::chmod(root.path("/directory").c_str(), 0700), 0);  // else it could not be removed
     EXPECT_EQ(content, std::nullopt);
     EXPECT_THAT(names, IsEmpty());
-    EXPECT_THAT(diagnostics,
+    EXPECT_THAT(ZR::Testing::textsOf(diagnostics),
                 ElementsAre("cannot read " + root.path("/file") + ": Permission denied",
                             "cannot read " + root.path("/directory") + ": Permission denied"));
 }
@@ -57,7 +58,7 @@ TEST(Files, WhatMayNotBeReadIsADiagnostic) {
 TEST(Files, AFileBeyondAllMeasureIsADiagnostic) {
     const TemporaryDirectory root;
     root.write("/large", std::string((std::size_t{4} << 20U) + 1, 'x'));
-    std::vector<std::string> diagnostics;
+    std::vector<ZR::Diagnostic> diagnostics;
     EXPECT_EQ(readOptionalFile(root.path("/large"), diagnostics), std::nullopt);
     EXPECT_EQ(diagnostics.size(), 1U);
 }

@@ -5,6 +5,7 @@
 
 #include "LinuxSupport.h"
 #include "ScriptedProcessor.h"
+#include "kit/Diagnostics.h"
 
 namespace ZR::Live {
 namespace {
@@ -30,7 +31,7 @@ class IpmiReaderTest : public testing::Test {
 
     ScriptedProcessor processor_ = ScriptedProcessor::withLan(1, 2, leased);
     std::chrono::steady_clock::time_point now_{1000h};
-    std::vector<std::string> diagnostics_;
+    std::vector<ZR::Diagnostic> diagnostics_;
     IpmiReader reader_{std::make_unique<ScriptedIpmi>(processor_), [this] { return now_; }};
 };
 
@@ -38,7 +39,7 @@ TEST_F(IpmiReaderTest, WithoutADeviceThereIsNoProcessor) {
     processor_.openError = ENOENT;
     EXPECT_FALSE(reader_.changed());
     EXPECT_EQ(read(), std::nullopt);
-    EXPECT_THAT(diagnostics_, IsEmpty());
+    EXPECT_THAT(ZR::Testing::textsOf(diagnostics_), IsEmpty());
     EXPECT_EQ(processor_.opened, 1);
     EXPECT_EQ(processor_.received, 0);
 }
@@ -120,7 +121,8 @@ TEST_F(IpmiReaderTest, SilenceLeavesWhatWasKnownUntilTheThirdTime) {
         static_cast<void>(reader_.changed());
         now_ += 2s;
         EXPECT_EQ(read(), known) << failure;
-        EXPECT_THAT(diagnostics_, ElementsAre("service processor: no response within one second"));
+        EXPECT_THAT(ZR::Testing::textsOf(diagnostics_),
+                    ElementsAre("service processor: no response within one second"));
     }
     now_ += 1min;
     static_cast<void>(reader_.changed());
@@ -131,7 +133,7 @@ TEST_F(IpmiReaderTest, SilenceLeavesWhatWasKnownUntilTheThirdTime) {
     now_ += 1min;
     static_cast<void>(reader_.changed());
     EXPECT_EQ(settled(), known);
-    EXPECT_THAT(diagnostics_, IsEmpty());
+    EXPECT_THAT(ZR::Testing::textsOf(diagnostics_), IsEmpty());
 }
 
 TEST_F(IpmiReaderTest, OneResponseMakesUpForFailures) {
@@ -163,7 +165,8 @@ TEST_F(IpmiReaderTest, ANewDiagnosticIsAChangeAndALastingOneIsNot) {
 TEST_F(IpmiReaderTest, ADeviceThatMayNotBeOpenedIsAProcessorOfWhichNothingIsKnown) {
     processor_.openError = EACCES;
     EXPECT_EQ(read(), ServiceProcessor{});
-    EXPECT_THAT(diagnostics_, ElementsAre("service processor: cannot open: Permission denied"));
+    EXPECT_THAT(ZR::Testing::textsOf(diagnostics_),
+                ElementsAre("service processor: cannot open: Permission denied"));
     EXPECT_FALSE(reader_.changed());
     EXPECT_TRUE(processor_.asked.empty());
 }

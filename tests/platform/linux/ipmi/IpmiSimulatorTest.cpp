@@ -12,6 +12,7 @@
 #include "RmcpSession.h"
 #include "Simulator.h"
 #include "ipmi/IpmiReader.h"
+#include "kit/Diagnostics.h"
 
 namespace ZR::Live {
 namespace {
@@ -29,7 +30,7 @@ class IpmiSimulatorTest : public testing::Test {
     /// The LAN channel that one reader comes to know. On a machine under load a second
     /// may not be enough for the simulator: then another reader begins anew.
     static std::optional<LanChannel> lanOf(const Simulator& simulator) {
-        std::vector<std::string> diagnostics;
+        std::vector<ZR::Diagnostic> diagnostics;
         for (int attempt = 0; attempt < 5; ++attempt) {
             IpmiReader reader{std::make_unique<RmcpSession>(simulator.port())};
             diagnostics.clear();
@@ -37,7 +38,7 @@ class IpmiSimulatorTest : public testing::Test {
                 std::this_thread::sleep_for(std::chrono::milliseconds{5});
                 const auto known = reader.read(diagnostics);
                 if (known && known->lan) {
-                    EXPECT_THAT(diagnostics, IsEmpty());
+                    EXPECT_THAT(ZR::Testing::textsOf(diagnostics), IsEmpty());
                     return known->lan;
                 }
             }

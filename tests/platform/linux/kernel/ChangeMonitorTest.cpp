@@ -14,6 +14,7 @@
 #include <functional>
 
 #include "LinuxSupport.h"
+#include "kit/Diagnostics.h"
 #include "kit/Namespaces.h"
 
 namespace ZR::Live {
@@ -27,9 +28,9 @@ class ChangeMonitorTest : public testing::Test {
         places_.push_back({.directory = root_.path(below), .namePrefix = prefix});
     }
     void begin() {
-        std::vector<std::string> diagnostics;
+        std::vector<ZR::Diagnostic> diagnostics;
         monitor_.begin(places_, diagnostics);
-        EXPECT_THAT(diagnostics, IsEmpty());
+        EXPECT_THAT(ZR::Testing::textsOf(diagnostics), IsEmpty());
     }
     void makeDirectory(const std::string& below) const {
         std::filesystem::create_directories(root_.path(below));
@@ -392,9 +393,9 @@ TEST(ChangeMonitorKernel, LinksAndAddressesAreNoticed) {
     EXPECT_TRUE(passesInNamespaces(20, [] {
         ChangeMonitor monitor;
         const auto begin = [&] {
-            std::vector<std::string> diagnostics;
+            std::vector<ZR::Diagnostic> diagnostics;
             monitor.begin({}, diagnostics);
-            EXPECT_THAT(diagnostics, IsEmpty());
+            EXPECT_THAT(ZR::Testing::textsOf(diagnostics), IsEmpty());
         };
         begin();
         EXPECT_FALSE(monitor.changed());
@@ -422,7 +423,7 @@ TEST(ChangeMonitorKernel, MoreNetworkEventsThanTheKernelKeepsCountAsAChange) {
     ZR_NEEDS_NAMESPACES();
     EXPECT_TRUE(passesInNamespaces(20, [] {
         ChangeMonitor monitor;
-        std::vector<std::string> diagnostics;
+        std::vector<ZR::Diagnostic> diagnostics;
         monitor.begin({}, diagnostics);
         const int fd = ::socket(AF_INET, SOCK_DGRAM | SOCK_CLOEXEC, 0);
         // The kernel keeps about 135 messages of a default socket and says ENOBUFS
@@ -436,7 +437,7 @@ TEST(ChangeMonitorKernel, MoreNetworkEventsThanTheKernelKeepsCountAsAChange) {
         EXPECT_FALSE(monitor.changed());
         run("ip link add br0 type bridge");
         EXPECT_TRUE(monitor.changed());
-        EXPECT_THAT(diagnostics, IsEmpty());
+        EXPECT_THAT(ZR::Testing::textsOf(diagnostics), IsEmpty());
     }));
 }
 

@@ -72,6 +72,59 @@ TEST(InterfaceRules, AnEndOfAVirtualCableIsAnInterfaceWhereItHasAnAddress) {
     EXPECT_TRUE(isNetworkInterface(linkOf("veth", "vrf"), true));
 }
 
+/// Cables with these indexes, which lead to these namespaces.
+Link cable(std::uint32_t ifindex, std::optional<std::int32_t> farNamespace,
+           const char* slaveKind = "") {
+    Link link = linkOf("veth", slaveKind);
+    link.ifindex = ifindex;
+    link.farNamespace = farNamespace;
+    return link;
+}
+
+TEST(WayOut, OfAContainerIsByTheCableThatHasAnAddressAndThoseBesideIt) {
+    const Link first = cable(2, 7);
+    const Link addressed = cable(3, 0);
+    const Link beside = cable(4, 0);
+    WayOut way;
+    way.add(first, false);
+    way.add(addressed, true);
+    way.add(beside, false);
+    way.add(cable(5, 7), true);
+    EXPECT_FALSE(way.isBy(first)) << "leads to a container within the container";
+    EXPECT_TRUE(way.isBy(addressed));
+    EXPECT_TRUE(way.isBy(beside));
+}
+
+TEST(WayOut, OfAContainerWithoutAnAddressIsByTheFirstCable) {
+    WayOut way;
+    way.add(cable(2, 0), false);
+    way.add(cable(3, 7), false);
+    EXPECT_TRUE(way.isBy(cable(2, 0)));
+    EXPECT_FALSE(way.isBy(cable(3, 7)));
+}
+
+TEST(WayOut, OfAMachineWithADeviceIsNotByACable) {
+    WayOut way;
+    way.add(cable(2, 0), true);
+    way.add(linkOf(""), false);
+    EXPECT_FALSE(way.isBy(cable(2, 0)));
+}
+
+TEST(WayOut, IsNotByACableWithinTheNamespaceOrAPort) {
+    Link loopback = linkOf("");
+    loopback.flags = IFF_LOOPBACK;
+    WayOut way;
+    way.add(loopback, true);
+    way.add(cable(2, std::nullopt), true);
+    way.add(cable(3, 5, "bridge"), true);
+    EXPECT_FALSE(way.isBy(cable(2, std::nullopt)));
+    EXPECT_FALSE(way.isBy(cable(3, 5, "bridge")));
+    way.add(linkOf("bridge"), true);
+    way.add(cable(4, 5), false);
+    EXPECT_TRUE(way.isBy(cable(4, 5)));
+    EXPECT_FALSE(way.isBy(cable(3, 5, "openvswitch")));
+}
+
 TEST(InterfaceRules, PortsOfLinksThatOwnTheirAddressesAreEnslaved) {
     for (const char* master : {"bond", "bridge", "team", "openvswitch"}) {
         EXPECT_TRUE(isEnslaved(linkOf("", master))) << master;

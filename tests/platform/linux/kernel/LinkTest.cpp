@@ -30,7 +30,8 @@ TEST(Link, EverythingThatTheKernelTells) {
         .number(IFLA_CARRIER, std::uint8_t{1})
         .number(IFLA_MASTER, std::uint32_t{9})
         .text(parentDeviceName, "0000:00:03.0")
-        .text(IFLA_QDISC, "fq_codel");
+        .text(IFLA_QDISC, "fq_codel")
+        .number(IFLA_LINK_NETNSID, std::int32_t{3});
     EXPECT_EQ(parseLink(message.bytes()), (Link{.ifindex = 7,
                                                 .name = "eth0"_name,
                                                 .flags = 0x11043,
@@ -40,7 +41,8 @@ TEST(Link, EverythingThatTheKernelTells) {
                                                 .slaveKind = "",
                                                 .master = 9,
                                                 .hasParentDevice = true,
-                                                .carrier = true}));
+                                                .carrier = true,
+                                                .farNamespace = 3}));
 }
 
 TEST(Link, KindAndSlaveKindAreNested) {

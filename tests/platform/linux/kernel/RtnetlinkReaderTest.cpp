@@ -14,6 +14,7 @@
 
 #include "LinuxSupport.h"
 #include "ScriptedTransport.h"
+#include "kit/Diagnostics.h"
 
 namespace ZR::Live {
 namespace {
@@ -71,7 +72,7 @@ TEST_F(RtnetlinkReaderTest, LinksAndAddressesOfOneMoment) {
     ASSERT_EQ(state.addresses.size(), 1U);
     EXPECT_EQ(state.addresses[0].ip, "198.51.100.7"_ip);
     EXPECT_TRUE(state.certain);
-    EXPECT_THAT(state.diagnostics, IsEmpty());
+    EXPECT_THAT(ZR::Testing::textsOf(state.diagnostics), IsEmpty());
     EXPECT_EQ(transport_->opened(), 1);
 }
 
@@ -104,7 +105,8 @@ TEST_F(RtnetlinkReaderTest, ADumpThatIsInterruptedAgainAndAgainIsKeptAsUncertain
     EXPECT_THAT(names(state), ElementsAre("busy"));
     EXPECT_EQ(state.addresses.size(), 1U);
     EXPECT_FALSE(state.certain);
-    EXPECT_THAT(state.diagnostics, ElementsAre(HasSubstr("changed while they were read")));
+    EXPECT_THAT(ZR::Testing::textsOf(state.diagnostics),
+                ElementsAre(HasSubstr("changed while they were read")));
 }
 
 TEST_F(RtnetlinkReaderTest, ResponsesThatWereLostAreAskedForAgainOnANewSocket) {
@@ -121,7 +123,7 @@ TEST_F(RtnetlinkReaderTest, ResponsesThatAreLostAgainAndAgainGiveNoLinks) {
     EXPECT_THAT(state.links, IsEmpty());
     EXPECT_THAT(state.addresses, IsEmpty());
     EXPECT_FALSE(state.certain);
-    EXPECT_THAT(state.diagnostics, ElementsAre(HasSubstr("lost")));
+    EXPECT_THAT(ZR::Testing::textsOf(state.diagnostics), ElementsAre(HasSubstr("lost")));
     EXPECT_EQ(transport_->asked(), 3);
 }
 
@@ -143,7 +145,8 @@ TEST_F(RtnetlinkReaderTest, DatagramsThatNoBufferHoldsEndAfterABoundedNumberOfTr
     const std::vector<Step> cut{Step::cut({linkMessage(2, "half")})};
     const NetworkState state = read({cut, cut, cut, cut, cut, cut});
     EXPECT_THAT(state.links, IsEmpty());
-    EXPECT_THAT(state.diagnostics, ElementsAre(HasSubstr("longer than the buffer")));
+    EXPECT_THAT(ZR::Testing::textsOf(state.diagnostics),
+                ElementsAre(HasSubstr("longer than the buffer")));
     EXPECT_EQ(transport_->asked(), 3);
 }
 
@@ -151,7 +154,8 @@ TEST_F(RtnetlinkReaderTest, ARefusalIsFinalAndNamesItsReason) {
     const NetworkState state = read({{parts({refusal(EPERM)})}});
     EXPECT_THAT(state.links, IsEmpty());
     EXPECT_FALSE(state.certain);
-    EXPECT_THAT(state.diagnostics, ElementsAre("network links: refused: Operation not permitted"));
+    EXPECT_THAT(ZR::Testing::textsOf(state.diagnostics),
+                ElementsAre("network links: refused: Operation not permitted"));
     EXPECT_EQ(transport_->asked(), 1);
 }
 
@@ -171,7 +175,7 @@ TEST_F(RtnetlinkReaderTest, ARefusalWithoutItsCodeIsARefusal) {
 TEST_F(RtnetlinkReaderTest, ADumpThatEndsWithAnErrorIsNone) {
     const NetworkState state = read({{parts({linkMessage(2, "eth0"), done(-ENOMEM)})}});
     EXPECT_THAT(state.links, IsEmpty());
-    EXPECT_THAT(state.diagnostics, ElementsAre(HasSubstr("broken off: ")));
+    EXPECT_THAT(ZR::Testing::textsOf(state.diagnostics), ElementsAre(HasSubstr("broken off: ")));
 }
 
 TEST_F(RtnetlinkReaderTest, OtherProcessesAreNotListenedTo) {
@@ -205,7 +209,7 @@ TEST_F(RtnetlinkReaderTest, EventsBetweenTheResponsesAreSkipped) {
     const NetworkState state =
         read({{parts({event, linkMessage(2, "eth0"), done()})}, someAddresses()});
     EXPECT_THAT(names(state), ElementsAre("eth0"));
-    EXPECT_THAT(state.diagnostics, IsEmpty());
+    EXPECT_THAT(ZR::Testing::textsOf(state.diagnostics), IsEmpty());
 }
 
 TEST_F(RtnetlinkReaderTest, AMalformedMessageIsLeftOutAndReported) {
@@ -216,7 +220,8 @@ TEST_F(RtnetlinkReaderTest, AMalformedMessageIsLeftOutAndReported) {
         read({{parts({malformed, linkMessage(3, "good"), done()})}, someAddresses()});
     EXPECT_THAT(names(state), ElementsAre("good"));
     EXPECT_FALSE(state.certain);
-    EXPECT_THAT(state.diagnostics, ElementsAre("network links: 1 malformed messages left out"));
+    EXPECT_THAT(ZR::Testing::textsOf(state.diagnostics),
+                ElementsAre("network links: 1 malformed messages left out"));
 }
 
 TEST_F(RtnetlinkReaderTest, AMessageLongerThanItsDatagramIsLeftOutAndReported) {
@@ -240,13 +245,14 @@ TEST_F(RtnetlinkReaderTest, AMessageOfALengthWithTheHighestBitIsLeftOutAndReport
 TEST_F(RtnetlinkReaderTest, SilenceEndsAtTheDeadline) {
     const NetworkState state = read({{}}, milliseconds{60});
     EXPECT_THAT(state.links, IsEmpty());
-    EXPECT_THAT(state.diagnostics, ElementsAre(HasSubstr("no response: ")));
+    EXPECT_THAT(ZR::Testing::textsOf(state.diagnostics), ElementsAre(HasSubstr("no response: ")));
 }
 
 TEST_F(RtnetlinkReaderTest, ADumpThatNeverEndsEndsAtTheDeadline) {
     const NetworkState state = read({{Step::endless({linkMessage(2, "again")})}}, milliseconds{60});
     EXPECT_THAT(state.links, IsEmpty());
-    EXPECT_THAT(state.diagnostics, ElementsAre(HasSubstr("no complete response in time")));
+    EXPECT_THAT(ZR::Testing::textsOf(state.diagnostics),
+                ElementsAre(HasSubstr("no complete response in time")));
 }
 
 // No real kernel can be made to keep a request at will; so this one does.
@@ -259,7 +265,7 @@ TEST_F(RtnetlinkReaderTest, TimeForWhichTheKernelKeepsTheRequestIsNotTheResponse
     EXPECT_THAT(names(state), ElementsAre("lo", "eth0"));
     EXPECT_EQ(state.addresses.size(), 1U);
     EXPECT_TRUE(state.certain);
-    EXPECT_THAT(state.diagnostics, IsEmpty());
+    EXPECT_THAT(ZR::Testing::textsOf(state.diagnostics), IsEmpty());
 }
 
 TEST_F(RtnetlinkReaderTest, AfterTheDeadlineNothingIsAskedForAgain) {
@@ -274,7 +280,8 @@ TEST_F(RtnetlinkReaderTest, AfterTheDeadlineNothingIsAskedForAgain) {
     EXPECT_THAT(names(state), ElementsAre("busy"));
     EXPECT_EQ(state.addresses.size(), 1U);
     EXPECT_FALSE(state.certain) << "to be read again";
-    EXPECT_THAT(state.diagnostics, ElementsAre("network links: changed while they were read"));
+    EXPECT_THAT(ZR::Testing::textsOf(state.diagnostics),
+                ElementsAre("network links: changed while they were read"));
 }
 
 TEST_F(RtnetlinkReaderTest, AfterAFailureTheNextReadingBeginsAnew) {
@@ -289,7 +296,8 @@ TEST_F(RtnetlinkReaderTest, UnreadableAddressesLeaveTheLinks) {
     EXPECT_THAT(names(state), ElementsAre("lo", "eth0"));
     EXPECT_THAT(state.addresses, IsEmpty());
     EXPECT_FALSE(state.certain);
-    EXPECT_THAT(state.diagnostics, ElementsAre("network addresses: refused: Permission denied"));
+    EXPECT_THAT(ZR::Testing::textsOf(state.diagnostics),
+                ElementsAre("network addresses: refused: Permission denied"));
 }
 
 TEST_F(RtnetlinkReaderTest, AnInterruptedDumpOfAddressesIsRepeatedAlone) {
@@ -317,7 +325,9 @@ TEST_F(RtnetlinkReaderTest, EveryRefusalLeavesNoLinksAndIsUncertain) {
         const NetworkState state = read({{parts({refusal(code)})}});
         EXPECT_THAT(state.links, IsEmpty()) << code;
         EXPECT_FALSE(state.certain) << code;
-        EXPECT_THAT(state.diagnostics, ElementsAre(HasSubstr("network links: "))) << code;
+        EXPECT_THAT(ZR::Testing::textsOf(state.diagnostics),
+                    ElementsAre(HasSubstr("network links: ")))
+            << code;
     }
 }
 
@@ -369,7 +379,8 @@ TEST_F(RtnetlinkReaderTest, ASocketThatCannotBeOpenedIsAReason) {
     RtnetlinkReader reader{std::move(transport)};
     const NetworkState state = reader.read(steady_clock::now() + milliseconds{200});
     EXPECT_THAT(state.links, IsEmpty());
-    EXPECT_THAT(state.diagnostics, ElementsAre(HasSubstr("cannot be asked for: ")));
+    EXPECT_THAT(ZR::Testing::textsOf(state.diagnostics),
+                ElementsAre(HasSubstr("cannot be asked for: ")));
 }
 
 }  // namespace

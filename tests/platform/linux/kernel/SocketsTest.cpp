@@ -7,6 +7,7 @@
 #include <sys/socket.h>
 
 #include "LinuxSupport.h"
+#include "kit/Diagnostics.h"
 #include "kit/Namespaces.h"
 #include "zrcommon/UniqueFd.h"
 
@@ -22,42 +23,92 @@ TEST(UdpSockets, OnlyThoseOfTheClientPort) {
         parseUdpSockets(
             "   sl  local_address rem_address   st tx_queue rx_queue tr tm->when retrnsmt   uid\n"
             "  142: 076433C6:0044 016433C6:0043 01 00000000:00000000 00:00000000 00000000     0\n"
-            "  143: 00000000:0044 00000000:0000 07 00000000:00000000 00:00000000 00000000     0\n"
+            "  143: 00000000:0044 00000000:0000 07 00000000:00000000 00:00000000 00000000  1000\n"
             "  144: 00000000:0043 00000000:0000 07 00000000:00000000 00:00000000 00000000     0\n"),
         ElementsAre(PortSocket{.address = "198.51.100.7"_ip, .peer = "198.51.100.1"_ip},
-                    PortSocket{.address = {}, .peer = {}}));
+                    PortSocket{.address = {}, .peer = {}, .user = 1000}));
 }
 
 TEST(UdpSockets, AnyTextGivesFacts) {
-    for (const char* text : {"", "\n\n", "1: 2 3", "1: 2:45 3:4", "1: x:0044 0:0",
-                             "1: 00000000:0044", "1: 100000000:0044 00000000:0000"}) {
+    for (const char* text :
+         {"", "\n\n", "1: 2 3", "1: 2:45 3:4", "1: x:0044 0:0", "1: 00000000:0044",
+          "1: 100000000:0044 00000000:0000", "1: 00000000:0044 00000000:0000 07 0:0 0:0 0",
+          "1: 00000000:0044 00000000:0000 07 0:0 0:0 0 x"}) {
         EXPECT_THAT(parseUdpSockets(text), IsEmpty()) << text;
     }
 }
 
-TEST(PacketLinks, EachLinkOnceWhereIPv4IsHeard) {
-    EXPECT_THAT(parsePacketLinks("sk       RefCnt Type Proto  Iface R Rmem   User   Inode\n"
-                                 "0000000000000000 3      3    0003   2     1 0      0      1\n"
-                                 "0000000000000000 3      3    0800   3     1 0      0      2\n"
-                                 "0000000000000000 3      3    0003   2     1 0      0      3\n"
-                                 "0000000000000000 3      3    88cc   4     1 0      0      4\n"
-                                 "0000000000000000 3      3    0003   0     1 0      0      5\n"),
-                ElementsAre(2, 3));
-    EXPECT_THAT(parsePacketLinks("a b c 0003\n\nx"), IsEmpty());
+TEST(PacketSockets, ThoseThatHearIPv4OnALink) {
+    EXPECT_THAT(
+        parsePacketSockets("sk       RefCnt Type Proto  Iface R Rmem   User   Inode\n"
+                           "0000000000000000 3      3    0003   2     1 0      0      1\n"
+                           "0000000000000000 3      3    0800   3     1 0      0      2\n"
+                           "0000000000000000 3      3    0003   2     1 0      0      3\n"
+                           "0000000000000000 3      3    88cc   4     1 0      0      4\n"
+                           "0000000000000000 3      3    0003   0     1 0      0      5\n"),
+        ElementsAre(PacketSocket{.link = 2, .inode = 1}, PacketSocket{.link = 3, .inode = 2},
+                    PacketSocket{.link = 2, .inode = 3}));
+    EXPECT_THAT(parsePacketSockets("a b c 0003\n\nx\n0 3 3 0003 2 1 0 0 x\n"), IsEmpty());
+}
+
+TEST(Sockets, EachLinkOnceAndOnlyBesideABoundSocket) {
+    const TemporaryDirectory root;
+    const Roots roots{.files = root.path(), .proc = root.path("/proc")};
+    root.write("/proc/thread-self/net/packet",
+               "0 3 3 0003 2 1 0 0 1\n0 3 3 0003 3 1 0 0 2\n0 3 3 0003 2 1 0 0 3\n");
+    std::vector<ZR::Diagnostic> diagnostics;
+    EXPECT_THAT(readSockets(roots, diagnostics).packetLinks, IsEmpty());
+    root.write("/proc/thread-self/net/udp", "1: 00000000:0044 00000000:0000 07 0:0 0:0 0 0\n");
+    EXPECT_THAT(readSockets(roots, diagnostics).packetLinks, ElementsAre(2, 3));
+    EXPECT_THAT(ZR::Testing::textsOf(diagnostics), IsEmpty());
+}
+
+TEST(Sockets, WhereEveryUserMayBindThePortOnlyClientsAreBelieved) {
+    const TemporaryDirectory root;
+    const Roots roots{.files = root.path(), .proc = root.path("/proc")};
+    root.write("/proc/thread-self/net/udp",
+               "1: 00000000:0044 00000000:0000 07 0:0 0:0 0 0\n"
+               "2: 00000000:0044 00000000:0000 07 0:0 0:0 0 998\n"
+               "3: 00000000:0044 00000000:0000 07 0:0 0:0 0 1000\n");
+    const std::vector<uid_t> users{998};
+    const auto found = [&](std::vector<ZR::Diagnostic>& diagnostics) {
+        std::vector<uid_t> owners;
+        for (const PortSocket& socket : readSockets(roots, diagnostics, users).bound) {
+            owners.push_back(socket.user);
+        }
+        return owners;
+    };
+    for (const char* start : {"", "1024\n", "69\n"}) {
+        if (*start != '\0') {
+            root.write("/proc/sys/net/ipv4/ip_unprivileged_port_start", start);
+        }
+        std::vector<ZR::Diagnostic> diagnostics;
+        EXPECT_THAT(found(diagnostics), ElementsAre(0, 998, 1000)) << start;
+        EXPECT_THAT(ZR::Testing::textsOf(diagnostics), IsEmpty()) << start;
+    }
+    for (const char* start : {"68\n", "0\n"}) {
+        root.write("/proc/sys/net/ipv4/ip_unprivileged_port_start", start);
+        std::vector<ZR::Diagnostic> diagnostics;
+        EXPECT_THAT(found(diagnostics), ElementsAre(0, 998)) << start;
+        EXPECT_THAT(diagnostics,
+                    ElementsAre(ZR::Diagnostic{"a socket of user 1000 on UDP port 68 is not "
+                                               "trusted: every user may open one here",
+                                               ZR::Diagnostic::Kind::Untrusted}));
+    }
 }
 
 TEST(Sockets, WithoutAProcessFileSystemThereAreNone) {
     const TemporaryDirectory root;
-    std::vector<std::string> diagnostics;
+    std::vector<ZR::Diagnostic> diagnostics;
     EXPECT_EQ(readSockets({.files = root.path(), .proc = root.path("/proc")}, diagnostics),
               ClientSockets{});
-    EXPECT_THAT(diagnostics, IsEmpty());
+    EXPECT_THAT(ZR::Testing::textsOf(diagnostics), IsEmpty());
 }
 
 TEST(Sockets, OfARealKernel) {
     ZR_NEEDS_NAMESPACES();
     EXPECT_TRUE(passesInNamespaces(30, [] {
-        std::vector<std::string> diagnostics;
+        std::vector<ZR::Diagnostic> diagnostics;
         EXPECT_EQ(readSockets({}, diagnostics), ClientSockets{});
 
         run("ip link set lo up");
@@ -81,7 +132,13 @@ TEST(Sockets, OfARealKernel) {
         EXPECT_THAT(sockets.bound,
                     ElementsAre(PortSocket{.address = "127.0.0.1"_ip, .peer = "127.0.0.2"_ip}));
         EXPECT_THAT(sockets.packetLinks, IsEmpty()) << "it hears all links";
-        EXPECT_THAT(diagnostics, IsEmpty());
+        EXPECT_THAT(ZR::Testing::textsOf(diagnostics), IsEmpty());
+
+        ASSERT_EQ(::fchown(client.get(), 65534, 65534), 0);  // as if nobody had opened it
+        EXPECT_EQ(readSockets({}, diagnostics).bound.at(0).user, 65534U);
+        run("echo 68 > /proc/sys/net/ipv4/ip_unprivileged_port_start");
+        EXPECT_THAT(readSockets({}, diagnostics).bound, IsEmpty());
+        EXPECT_EQ(diagnostics.size(), 1U);
     }));
 }
 

@@ -1,4 +1,5 @@
 // The operations as a client sees them, on the test providers.
+#include "cimom/Results.h"
 #include "operations/Operations.h"
 
 #include <gmock/gmock.h>

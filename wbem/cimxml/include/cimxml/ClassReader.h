@@ -1,6 +1,6 @@
 #pragma once
 
-#include "cimom/ClassDeclaration.h"
+#include "cimom/Forward.h"
 #include "cimxml/XmlDocument.h"
 
 namespace cimom::wbem {

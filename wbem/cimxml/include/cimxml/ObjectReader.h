@@ -3,7 +3,7 @@
 #include <string>
 #include <vector>
 
-#include "cimom/Instance.h"
+#include "cimom/Forward.h"
 #include "cimxml/XmlDocument.h"
 
 /// Reads the elements of DSP0201 into the model. Attributes that have no meaning

@@ -5,8 +5,7 @@
 #include <string_view>
 #include <vector>
 
-#include "cimom/ClassDeclaration.h"
-#include "cimom/Instance.h"
+#include "cimom/Forward.h"
 
 /// Writes objects as the elements of DSP0201, appended to a buffer. Whatever the
 /// objects hold, the elements are well-formed and of the structure of DSP0203.

@@ -5,7 +5,7 @@
 #include <string_view>
 #include <vector>
 
-#include "cimom/Instance.h"
+#include "cimom/Forward.h"
 
 namespace cimom::wbem {
 

@@ -2,7 +2,7 @@
 
 #include <string>
 
-#include "cimom/Instance.h"
+#include "cimom/Forward.h"
 
 namespace cimom::wbem {
 

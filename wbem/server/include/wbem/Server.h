@@ -4,11 +4,8 @@
 #include <memory>
 #include <string>
 
+#include "cimom/Forward.h"
 #include "wbem/ServerSettings.h"
-
-namespace cimom {
-class ObjectManager;
-}
 
 namespace cimom::wbem {
 

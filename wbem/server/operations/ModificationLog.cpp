@@ -1,7 +1,8 @@
-#include "operations/Modification.h"
+#include "operations/ModificationLog.h"
 
 #include "cimom/ObjectPathText.h"
 #include "cimxml/Errors.h"
+#include "operations/Modification.h"
 
 namespace cimom::wbem {
 

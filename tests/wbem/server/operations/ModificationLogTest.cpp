@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include "cimom/ObjectPathText.h"
+#include "operations/ModificationLog.h"
 
 namespace cimom::wbem {
 

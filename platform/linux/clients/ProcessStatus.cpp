@@ -1,0 +1,50 @@
+#include "clients/ProcessStatus.h"
+
+#include <algorithm>
+#include <cstddef>
+
+#include "formats/Numbers.h"
+
+namespace ZR::Live {
+namespace {
+
+constexpr std::string_view blanks = " \t";
+constexpr int hexadecimal = 16;
+
+/// Takes the next word off a text.
+std::string_view nextWord(std::string_view& text) {
+    text.remove_prefix(std::min(text.find_first_not_of(blanks), text.size()));
+    const std::string_view word = text.substr(0, text.find_first_of(blanks));
+    text.remove_prefix(word.size());
+    return word;
+}
+
+}  // namespace
+
+std::optional<ProcessStatus> parseProcessStatus(std::string_view text) {
+    ProcessStatus status;
+    bool hasUsers = false;
+    while (!text.empty()) {
+        const std::size_t end = std::min(text.find('\n'), text.size());
+        std::string_view line = text.substr(0, end);
+        text.remove_prefix(std::min(end + 1, text.size()));
+        const std::string_view key = nextWord(line);
+        const std::string_view value = nextWord(line);
+        if (key == "State:" && !value.empty()) {
+            status.state = value.front();
+        } else if (key == "PPid:") {
+            status.parent = parseNumber<std::int32_t>(value).value_or(0);
+        } else if (key == "Uid:") {
+            const auto real = parseNumber<std::uint32_t>(value);
+            const auto effective = parseNumber<std::uint32_t>(nextWord(line));
+            hasUsers = real && effective;
+            status.realUser = real.value_or(0);
+            status.user = effective.value_or(0);
+        } else if (key == "CapEff:") {
+            status.capabilities = parseNumber<std::uint64_t>(value, hexadecimal).value_or(0);
+        }
+    }
+    return hasUsers && status.state != '\0' ? std::optional{status} : std::nullopt;
+}
+
+}  // namespace ZR::Live
