@@ -69,13 +69,24 @@ function(zr_precompiled target)
     target_precompile_headers(${target} REUSE_FROM room_headers)
 endfunction()
 
-# zr_compiled_together(TARGET file...): the quick build of scripts/run compiles these
-# sources as one.
+# zr_compiled_together(TARGET [EXCEPT file...]): the quick build of scripts/run compiles
+# the sources of each folder of the target as one, but for those whose own names another
+# one of the folder has, too: what they instantiate of templates is then made once.
 function(zr_compiled_together target)
-    if(CMAKE_BUILD_TYPE STREQUAL "Quick")
-        set_target_properties(${target} PROPERTIES UNITY_BUILD ON UNITY_BUILD_MODE GROUP)
-        set_source_files_properties(${ARGN} PROPERTIES UNITY_GROUP ${target})
+    if(NOT CMAKE_BUILD_TYPE STREQUAL "Quick")
+        return()
     endif()
+    cmake_parse_arguments(TOGETHER "" "" "EXCEPT" ${ARGN})
+    set_target_properties(${target} PROPERTIES UNITY_BUILD ON UNITY_BUILD_MODE GROUP)
+    get_target_property(sources ${target} SOURCES)
+    foreach(source IN LISTS sources)
+        cmake_path(RELATIVE_PATH source BASE_DIRECTORY ${CMAKE_CURRENT_SOURCE_DIR})
+        cmake_path(GET source PARENT_PATH folder)
+        string(MAKE_C_IDENTIFIER "${target}/${folder}" group)
+        if(NOT source IN_LIST TOGETHER_EXCEPT)
+            set_source_files_properties(${source} PROPERTIES UNITY_GROUP ${group})
+        endif()
+    endforeach()
 endfunction()
 
 # zr_room(NAME SOURCES file... [ROOT directory] [LINKS target...] [PRIVATE_LINKS target...])

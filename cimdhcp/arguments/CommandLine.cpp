@@ -43,7 +43,8 @@ Examples:
 Exit status:
   0  done
   1  the response has a CIM status other than OK (its name is on standard error),
-     a rename was not possible, or nothing was modified
+     a rename was not possible, nothing was modified, or the check has found
+     something wrong
   2  the command line cannot be understood
   3  the provider or a file cannot be loaded, a server cannot be reached or
      understood, or the output cannot be written
@@ -57,7 +58,8 @@ CIMDHCP_REGISTRATION_DIR and CIMDHCP_PROVIDER_DIR names others.
 "cimdhcp COMMAND --help" explains a command. The options above may stand
 before or behind the command.)";
 
-constexpr const char* checkHelp = R"(Each line begins with "ok", with "note" (worth a look) or with "BAD" (wrong); an arrow below
+constexpr const char* checkHelp =
+    R"(Each line begins with "ok", with "note" (worth a look) or with "BAD" (wrong); an arrow below
 it shows the remedy.
 
 Exit status:

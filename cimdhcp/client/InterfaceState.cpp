@@ -39,16 +39,12 @@ bool isIPv4(const LeaseOverview& lease) {
     return lease.family == ZR::NodeLexicon::familyIPv4;
 }
 
-/// A client whose lease is not known: it asks for one, unless the address of the interface
-/// was obtained by it, or may have been.
-InterfaceState withoutLease(const LeaseOverview& lease, const InterfaceOverview& interface) {
-    const InterfaceState own = told(lease.clientState);
-    if (own != InterfaceState::unknown) {
-        return own;
-    }
+/// A client that does not tell its state, nor when its lease ends: it asks for one, unless
+/// the address of the interface was obtained by it, or may have been.
+InterfaceState withoutTimes(const LeaseOverview& lease, const InterfaceOverview& interface) {
     const bool hasAddress = isIPv4(lease) && interface.address && !interface.address->empty();
-    if (!hasAddress) {
-        return InterfaceState::asking;
+    if (!hasAddress || (!lease.address.empty() && lease.address != interface.address)) {
+        return lease.address.empty() ? InterfaceState::asking : InterfaceState::unknown;
     }
     switch (static_cast<AddressSource>(interface.addressSource.value_or(0))) {
         case AddressSource::DHCP:
@@ -57,7 +53,7 @@ InterfaceState withoutLease(const LeaseOverview& lease, const InterfaceOverview&
         case AddressSource::Unknown:
             return InterfaceState::unknown;
         default:
-            return InterfaceState::asking;
+            return lease.address.empty() ? InterfaceState::asking : InterfaceState::unknown;
     }
 }
 
@@ -95,15 +91,12 @@ InterfaceState stateOf(const LeaseOverview& lease, const InterfaceOverview& inte
     if (hasPassed(lease.expires, now)) {
         return InterfaceState::expired;
     }
-    if (lease.address.empty()) {
-        return withoutLease(lease, interface);
-    }
     const InterfaceState own = told(lease.clientState);
-    if (own == InterfaceState::asking || own == InterfaceState::rebinding) {
-        return own;
+    if (own == InterfaceState::unknown && (lease.address.empty() || !lease.expires)) {
+        return withoutTimes(lease, interface);
     }
-    if (own == InterfaceState::unknown && !lease.expires) {
-        return InterfaceState::unknown;
+    if (own != InterfaceState::bound && own != InterfaceState::unknown) {
+        return own;
     }
     // Where no client runs, none asks.
     if (lease.clientGone) {

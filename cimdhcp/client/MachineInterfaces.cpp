@@ -100,12 +100,14 @@ LeaseOverview leaseOf(const ZR::Snapshot& snapshot, ZR::Snapshot::Index node) {
     return lease;
 }
 
-/// Whether a diagnostic says of the interface that the client of its lease does not run.
-bool isClientGone(const ZR::Snapshot& snapshot, const std::string& interface) {
+/// Whether a diagnostic says that the client of the interface's lease does not run.
+bool isClientGone(const ZR::Snapshot& snapshot, const std::string& interface,
+                  const LeaseOverview& lease) {
     const auto diagnostics = snapshot.diagnostics();
     return std::any_of(diagnostics.begin(), diagnostics.end(), [&](const ZR::Diagnostic& each) {
-        return each.kind == ZR::Diagnostic::Kind::ClientGone &&
-               each.text.starts_with(interface + ": ");
+        return each.kind == ZR::Diagnostic::Kind::ClientGone && !lease.address.empty() &&
+               each.text.starts_with(interface + ": ") &&
+               each.text.find(' ' + lease.address + ' ') != std::string::npos;
     });
 }
 
@@ -146,7 +148,7 @@ std::vector<InterfaceOverview> interfacesOf(const ZR::Snapshot& snapshot) {
         if (place != places.end()) {
             InterfaceOverview& interface = interfaces[place->second];
             LeaseOverview lease = leaseOf(snapshot, node);
-            lease.clientGone = !lease.process && isClientGone(snapshot, interface.name);
+            lease.clientGone = isClientGone(snapshot, interface.name, lease);
             interface.leases->push_back(std::move(lease));
         }
     }

@@ -7,13 +7,15 @@
 #include <vector>
 
 #include "cimom/Instance.h"
+#include "zrclient/NodeLexicon.h"
 #include "zrclient/Snapshot.h"
 
 namespace cimdhcp {
 
 /// The systems that interfaces belong to, as a setting's InstanceID names them.
-inline constexpr std::string_view hostSystem = "Computer";
-inline constexpr std::string_view serviceProcessorSystem = "BMC";
+inline constexpr std::string_view hostSystem = ZR::NodeLexicon::hostDescription;
+inline constexpr std::string_view serviceProcessorSystem =
+    ZR::NodeLexicon::serviceProcessorDescription;
 
 /// An interface within the machine, as the InstanceID of its setting names it.
 struct InterfaceId {

@@ -67,7 +67,7 @@ class Examination {
         }
         const ZR::PlatformSettings& settings = ZR::PlatformSettings::process();
         const char* const named = std::getenv("ZR_CONFIG");
-        const std::string file = named == nullptr ? "/etc/zr/platform.conf" : named;
+        const std::string file = named == nullptr ? ZR::PlatformSettings::defaultFile : named;
         for (const std::string& diagnostic : settings.diagnostics) {
             add(Verdict::bad, "settings", printable(diagnostic),
                 "correct it; docs/settings.md lists the settings");

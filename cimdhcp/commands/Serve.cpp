@@ -18,6 +18,7 @@
 #include "tklogger/TKLogger.h"
 #include "wbem/Server.h"
 #include "zrcommon/File.h"
+#include "zrcommon/LogLevel.h"
 
 namespace cimdhcp {
 
@@ -52,15 +53,14 @@ cimom::wbem::ServerSettings settingsOf(const ServeCommand& command) {
     return settings;
 }
 
-/// Notices and failures are kept by default (LOG_LEVEL 6000); lines about each request,
+/// Notices and failures are kept by default; lines about each request,
 /// which only help to find a fault, are not.
 void log(cimom::wbem::LogKind kind, const std::string& message) {
-    constexpr int important = 6000;
-    constexpr int flow = 4000;
     static const std::string category = "ZR.WBEM";
-    TKLog::TKLogger::logLevelMessage("cimdhcp/Serve", "log", __LINE__, category,
-                                     kind == cimom::wbem::LogKind::request ? flow : important,
-                                     nullptr, 0, 0, message);
+    TKLog::TKLogger::logLevelMessage(
+        "cimdhcp/Serve", "log", __LINE__, category,
+        kind == cimom::wbem::LogKind::request ? ZR::LogLevel::flow : ZR::LogLevel::failure, nullptr,
+        0, 0, message);
 }
 
 /// The signals that end the server, as sigwait wants them: blocked in all threads,

@@ -19,7 +19,8 @@ int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
                                                                       : "none") +
         fuzz::shellLine("IPV4ADDR", fuzz::textOf(result.address)) +
         fuzz::shellLine("ROOTSERVER", result.server ? fuzz::textOf(result.server) : "0.0.0.0") +
-        fuzz::shellLine("DHCPLEASETIME", std::to_string(result.leaseTime));
+        fuzz::shellLine("DHCPLEASETIME", std::to_string(result.leaseTime)) +
+        fuzz::shellLine("UPTIME", result.uptime ? std::to_string(*result.uptime) : "");
     fuzz::require(ZR::Live::parseIpconfig(again) == result, "a result survives being written");
     return 0;
 }

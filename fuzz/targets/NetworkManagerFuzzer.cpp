@@ -11,14 +11,16 @@ void checkDevice(std::string_view text) {
     const auto device = ZR::Live::parseNetworkManagerDevice(text);
     std::string again = std::string("[device]\nmanaged=") + (device.managed ? "true" : "false") +
                         "\nconnection-uuid=" + device.profile + '\n';
-    if (device.dhcp4) {
-        again += "[dhcp4]\ndhcp4.ip_address=" + fuzz::textOf(device.address4) +
-                 "\ndhcp4.dhcp_server_identifier=" + fuzz::textOf(device.server4) + '\n';
-        again += "dhcp4.expiry=" + std::to_string(device.expires4) + '\n';
+    for (const auto& [name, value] : device.options4) {
+        again += "[dhcp4]\ndhcp4." + name + '=' + value + '\n';
     }
-    again += device.dhcp6 ? "[dhcp6]\nwhatever=1\n" : "";
-    fuzz::require(device.dhcp4 || (!device.address4 && !device.server4),
-                  "only a lease has an address");
+    for (const auto& [name, value] : device.options6) {
+        again += "[dhcp6]\ndhcp6." + name + '=' + value + '\n';
+    }
+    const auto lease4 = ZR::Live::networkManagerLease4(device.options4);
+    fuzz::require(!lease4 || lease4->address.isIPv4(), "a DHCPv4 lease has an IPv4 address");
+    const auto lease6 = ZR::Live::networkManagerLease6(device.options6);
+    fuzz::require(!lease6 || !lease6->address.isIPv4(), "a DHCPv6 lease has an IPv6 address");
     fuzz::require(ZR::Live::parseNetworkManagerDevice(again) == device,
                   "a device survives being written");
 }

@@ -7,16 +7,19 @@
 
 namespace {
 
-using Addresses = std::vector<ZR::Live::NetworkdAddress>;
+using ZR::Live::NetworkdDescription;
 
-std::string written(const Addresses& addresses) {
+std::string written(const NetworkdDescription& description) {
     nlohmann::json links = nlohmann::json::array();
-    for (const auto& address : addresses) {
+    for (const auto& address : description.addresses) {
         nlohmann::json each{{"Family", address.address.family()},
                             {"Address", fuzz::addressBytes(address.address)},
                             {"ConfigSource", address.source}};
         if (address.provider) {
             each["ConfigProvider"] = fuzz::addressBytes(*address.provider);
+        }
+        if (address.validUntil) {
+            each["ValidLifetimeUSec"] = *address.validUntil;
         }
         links.push_back(nlohmann::json{{"Index", address.ifindex},
                                        {"Addresses", nlohmann::json::array({each})}});
@@ -24,17 +27,18 @@ std::string written(const Addresses& addresses) {
     return nlohmann::json{{"Interfaces", links}}.dump();
 }
 
-void checkFacts(const Addresses& addresses) {
+void checkFacts(const NetworkdDescription& description) {
     ZR::Live::ClientFacts facts;
     facts.managements.push_back({.client = ZR::Live::Client::Networkd,
                                  .ifindex = 2,
                                  .dhcp4 = {},
                                  .dhcp6 = {},
                                  .staticAddresses = {}});
-    ZR::Live::addNetworkdDescription(addresses, facts);
-    fuzz::require(facts.leases.size() <= addresses.size(), "an address is leased once");
+    constexpr std::int64_t start = 1'795'213'000'000'000;
+    ZR::Live::addNetworkdDescription(description, start, facts);
+    fuzz::require(facts.leases.size() <= description.addresses.size(), "an address is leased once");
     ZR::Live::ClientFacts twice = facts;
-    ZR::Live::addNetworkdDescription(addresses, twice);
+    ZR::Live::addNetworkdDescription(description, start, twice);
     fuzz::require(twice == facts, "what is known already is not added");
 }
 
@@ -42,12 +46,14 @@ void checkFacts(const Addresses& addresses) {
 
 int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
     const auto parsed = ZR::Live::parseNetworkdDescription(fuzz::text(data, size));
-    const auto* const addresses = std::get_if<Addresses>(&parsed);
-    if (addresses == nullptr) {
+    const auto* const description = std::get_if<NetworkdDescription>(&parsed);
+    if (description == nullptr) {
         return 0;
     }
-    const auto again = ZR::Live::parseNetworkdDescription(written(*addresses));
-    fuzz::require(again == parsed, "addresses survive being written");
-    checkFacts(*addresses);
+    const auto again = ZR::Live::parseNetworkdDescription(written(*description));
+    const auto* const same = std::get_if<NetworkdDescription>(&again);
+    fuzz::require(same != nullptr && same->addresses == description->addresses,
+                  "addresses survive being written");
+    checkFacts(*description);
     return 0;
 }

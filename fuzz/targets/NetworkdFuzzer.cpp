@@ -31,7 +31,9 @@ void checkLink(std::string_view text) {
     const auto link = ZR::Live::parseNetworkdLink(text);
     const std::string again =
         line("ADMIN_STATE", link.adminState) + line("NETWORK_FILE", link.networkFile);
-    fuzz::require(ZR::Live::parseNetworkdLink(again) == link, "a link survives being written");
+    const auto same = ZR::Live::parseNetworkdLink(again);
+    fuzz::require(same.adminState == link.adminState && same.networkFile == link.networkFile,
+                  "a link survives being written");
 }
 
 void checkLease(std::string_view text) {
@@ -44,7 +46,10 @@ void checkLease(std::string_view text) {
     if (lease.lifetime) {
         again += "LIFETIME=" + spanOf(*lease.lifetime) + '\n';
     }
-    fuzz::require(ZR::Live::parseNetworkdLease(again) == lease, "a lease survives being written");
+    const auto same = ZR::Live::parseNetworkdLease(again);
+    fuzz::require(same.address == lease.address && same.server == lease.server &&
+                      same.lifetime == lease.lifetime,
+                  "a lease survives being written");
 }
 
 void checkNetwork(std::string_view text) {

@@ -7,7 +7,6 @@
 #include <iterator>
 #include <unordered_set>
 #include <utility>
-#include <variant>
 
 #include "Decide.h"
 #include "StateReaders.h"
@@ -31,11 +30,6 @@ constexpr std::chrono::seconds troublePause{1};
 // Ten thousand links take a twentieth of it. A busy machine needs longer, and links that
 // have come in part only are not shown.
 constexpr std::chrono::seconds kernelTime{1};
-constexpr std::chrono::milliseconds networkdTime{60};
-
-// A networkd that did not respond is not asked again for this time: each request to it
-// would make a reading wait.
-constexpr std::chrono::seconds networkdPause{30};
 
 // Files and command lines of clients name further files. Their directories are to be
 // watched, too, before they are read, which takes another round.
@@ -86,6 +80,7 @@ void reportToLog(std::string_view message) {
 
 LiveMachine::LiveMachine(Surroundings surroundings)
     : surroundings_(std::move(surroundings)),
+      buses_(std::move(surroundings_.buses)),
       reader_(std::move(surroundings_.transport)),
       processor_(
           surroundings_.ipmi ? std::move(surroundings_.ipmi) : ipmiDevice(surroundings_.roots),
@@ -138,7 +133,7 @@ std::shared_ptr<const Snapshot> LiveMachine::read() {
 
 std::shared_ptr<const Snapshot> LiveMachine::tryToRead() {
     ClientFacts clients = readClients();
-    consultNetworkd(clients);
+    buses_.consult(clients, surroundings_.uptime());
     NetworkState network = reader_.read(std::chrono::steady_clock::now() + kernelTime);
     std::move(network.diagnostics.begin(), network.diagnostics.end(),
               std::back_inserter(clients.diagnostics));
@@ -168,34 +163,6 @@ std::shared_ptr<const Snapshot> LiveMachine::tryToRead() {
                           readAt_};
     changesAt_ = machine.changesAt();
     return decide(machine, surroundings_.explain);
-}
-
-/// Where networkd manages links, asks it for what its files do not tell.
-void LiveMachine::consultNetworkd(ClientFacts& clients) {
-    const bool manages =
-        std::any_of(clients.managements.begin(), clients.managements.end(),
-                    [](const LinkConfiguration& each) { return each.client == Client::Networkd; });
-    const auto now = surroundings_.uptime();
-    if (!manages || !surroundings_.askNetworkd || now < networkdRest_) {
-        return;
-    }
-    const NetworkdResponse response =
-        surroundings_.askNetworkd(std::chrono::steady_clock::now() + networkdTime);
-    if (!response.reason.empty()) {
-        clients.diagnostics.emplace_back(response.reason);
-        networkdRest_ = now + networkdPause;
-        return;
-    }
-    if (response.json.empty()) {
-        return;
-    }
-    const auto parsed = parseNetworkdDescription(response.json);
-    if (const auto* const reason = std::get_if<std::string_view>(&parsed)) {
-        clients.diagnostics.emplace_back("cannot use what systemd-networkd says: " +
-                                         std::string{*reason});
-        return;
-    }
-    addNetworkdDescription(std::get<std::vector<NetworkdAddress>>(parsed), clients);
 }
 
 /// The end of a program may change nothing else that is watched.

@@ -12,7 +12,7 @@
 #include <vector>
 
 #include "Unannounced.h"
-#include "clients/NetworkdBus.h"
+#include "clients/ManagerBuses.h"
 #include "formats/Roots.h"
 #include "ipmi/IpmiReader.h"
 #include "kernel/ChangeMonitor.h"
@@ -35,9 +35,7 @@ struct Surroundings {
     /// The way to the service processor; null: the device of the machine at `roots`.
     std::unique_ptr<IpmiTransport> ipmi = nullptr;
     IpmiReader::Clock uptime = std::chrono::steady_clock::now;
-    /// Asks networkd for its description of itself; empty: networkd is not asked.
-    std::function<NetworkdResponse(std::chrono::steady_clock::time_point)> askNetworkd =
-        Live::askNetworkd;
+    ManagerBuses::Ways buses;
     Explain explain = Explain::No;
     /// Takes what could not be read, or not for certain.
     std::function<void(std::string_view)> report;
@@ -55,25 +53,24 @@ class LiveMachine final : public SnapshotSource {
   private:
     [[nodiscard]] std::shared_ptr<const Snapshot> tryToRead();
     [[nodiscard]] ClientFacts readClients();
-    void consultNetworkd(ClientFacts& clients);
     void watchProcesses(const ClientFacts& clients);
     [[nodiscard]] bool changedByTime();
     void planAnotherTry(const std::vector<Diagnostic>& diagnostics);
     void report(const std::vector<Diagnostic>& diagnostics);
 
     Surroundings surroundings_;
+    ManagerBuses buses_;
     RtnetlinkReader reader_;
     ChangeMonitor monitor_;
     IpmiReader processor_;
     std::vector<WatchedPlace> places_;
     Unannounced unannounced_;
-    std::int64_t readAt_ = 0;     // when the last snapshot was made
-    std::int64_t changesAt_ = 0;  // when it is no longer true, though nothing happens
-    std::int64_t lookedAt_ = 0;   // for what nothing announces
-    std::chrono::steady_clock::time_point networkdRest_;  // not to be asked before
-    std::unordered_set<std::string> reported_;            // of the last reading
-    bool troubled_ = false;                               // something could not be read
-    std::chrono::steady_clock::time_point troubleRest_;   // it is not tried again before
+    std::int64_t readAt_ = 0;                   // when the last snapshot was made
+    std::int64_t changesAt_ = 0;                // when it is no longer true, though nothing happens
+    std::int64_t lookedAt_ = 0;                 // for what nothing announces
+    std::unordered_set<std::string> reported_;  // of the last reading
+    bool troubled_ = false;                     // something could not be read
+    std::chrono::steady_clock::time_point troubleRest_;  // it is not tried again before
 };
 
 }  // namespace ZR::Live

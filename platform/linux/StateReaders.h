@@ -25,7 +25,8 @@ struct StateReader {
 /// programs run.
 [[nodiscard]] std::span<const StateReader> stateReaders() noexcept;
 
-/// Reads the sockets of clients, of which nothing notifies. The processes come before.
+/// Reads the sockets of clients, of which nothing notifies. Whom they are believed to be of
+/// depends on the processes in the facts.
 void readClientSockets(const Roots& roots, ClientFacts& facts);
 
 }  // namespace ZR::Live

@@ -27,12 +27,11 @@ std::string readLastProcess(const Roots& roots) {
     return std::string{text.substr(blank == std::string_view::npos ? 0 : blank + 1)};
 }
 
-/// Also where no socket is bound to the clients' port, as while a client asks for its first
-/// address.
-std::vector<std::uint32_t> readPacketLinks(const Roots& roots) {
+/// Also those beside which none is bound to the clients' port, as while a client asks for
+/// its first address.
+std::vector<PacketSocket> readPackets(const Roots& roots) {
     std::vector<Diagnostic> ignored;
-    return parsePacketLinks(
-        readOptionalFile(roots.proc + "/thread-self/net/packet", ignored).value_or(""));
+    return readPacketSockets(roots, ignored);
 }
 
 void takeProcesses(const ClientFacts& from, ClientFacts& to) {
@@ -51,12 +50,17 @@ bool sameProcesses(const ClientFacts& a, const ClientFacts& b) {
 
 void Unannounced::begin() {
     lastProcess_ = readLastProcess(roots_);
-    packetLinks_ = readPacketLinks(roots_);
+    packetSockets_ = readPackets(roots_);
     settled_ = false;
 }
 
 void Unannounced::keepProcesses(const ClientFacts& facts) {
-    takeProcesses(facts, known_);
+    takeProcesses(facts, processes_);
+}
+
+void Unannounced::keepSockets(const ClientFacts& facts) {
+    takeProcesses(facts, sockets_);
+    sockets_.sockets = facts.sockets;
 }
 
 bool Unannounced::changed() {
@@ -65,16 +69,16 @@ bool Unannounced::changed() {
     if (started || !settled_) {
         ClientFacts seen;
         readProcesses(roots_, seen);
-        if (!sameProcesses(seen, known_)) {
+        if (!sameProcesses(seen, processes_)) {
             return true;
         }
         lastProcess_ = std::move(last);
         settled_ = !started;
     }
     ClientFacts seen;
-    takeProcesses(known_, seen);  // a socket counts by its owner
+    takeProcesses(sockets_, seen);
     readClientSockets(roots_, seen);
-    return seen.sockets != known_.sockets || readPacketLinks(roots_) != packetLinks_;
+    return seen.sockets != sockets_.sockets || readPackets(roots_) != packetSockets_;
 }
 
 }  // namespace ZR::Live

@@ -1,12 +1,12 @@
 #pragma once
 
-#include <cstdint>
 #include <string>
 #include <utility>
 #include <vector>
 
 #include "facts/ClientFacts.h"
 #include "formats/Roots.h"
+#include "kernel/Sockets.h"
 
 namespace ZR::Live {
 
@@ -21,10 +21,12 @@ class Unannounced {
     /// To be called before the processes are read, so that nothing falls in between.
     void begin();
 
-    /// Keeps what was read since begin(), to compare with: the processes as they were read,
-    /// before other readers learnt more of them, and the sockets.
+    /// Keeps the processes, to compare with, as they were read: other readers may learn more
+    /// of them.
     void keepProcesses(const ClientFacts& facts);
-    void keepSockets(const ClientFacts& facts) { known_.sockets = facts.sockets; }
+
+    /// Keeps the sockets, likewise, and the processes of which they were believed to be.
+    void keepSockets(const ClientFacts& facts);
 
     /// Looks whether clients or their sockets differ from what was kept. What cannot be read
     /// counts as not there.
@@ -36,8 +38,9 @@ class Unannounced {
     /// A process gets the name of its program some time after its number: it is looked for
     /// once more when no other has started.
     bool settled_ = false;
-    std::vector<std::uint32_t> packetLinks_;
-    ClientFacts known_;  // processes and sockets alone
+    std::vector<PacketSocket> packetSockets_;
+    ClientFacts processes_;  // nothing else
+    ClientFacts sockets_;    // and the processes of which they were believed to be
 };
 
 }  // namespace ZR::Live

@@ -84,8 +84,9 @@ bool DHCPProtocolEndpoint::getElementName(std::string& value) const {
 
 bool DHCPProtocolEndpoint::getSystemName(std::string& value) const {
     const ParameterScope scope(ZR_HERE, " value=", &value);
-    if (readSystemDescription(cursor_, ZR_HERE, "nodeString") == serviceProcessorDescription) {
-        value = serviceProcessorName;
+    if (readSystemDescription(cursor_, ZR_HERE, "nodeString") ==
+        NodeLexicon::serviceProcessorDescription) {
+        value = NodeLexicon::serviceProcessorName;
         return true;
     }
     return readHostName(value, ZR_HERE);

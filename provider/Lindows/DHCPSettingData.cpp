@@ -69,7 +69,8 @@ bool DHCPSettingData::getInstanceID(std::string& value) const {
     std::string name;
     getElementName(name);
     const std::string description = readSystemDescription(cursor_, ZR_HERE, "systemNode");
-    value = description == serviceProcessorDescription ? description : computerDescription;
+    value = description == NodeLexicon::serviceProcessorDescription ? description
+                                                                    : NodeLexicon::hostDescription;
     value += '%';
     value += name;
     return true;

@@ -21,8 +21,9 @@ std::string readSystemDescription(const Instrumentation& cursor, const TracePoin
 }
 
 const char* systemClassOf(const std::string& systemDescription) {
-    return systemDescription == serviceProcessorDescription ? "QVXZR_SPComputerSystem"
-                                                            : Classes::computerSystem.name;
+    return systemDescription == NodeLexicon::serviceProcessorDescription
+               ? "QVXZR_SPComputerSystem"
+               : Classes::computerSystem.name;
 }
 
 bool readHostName(std::string& name, const TracePoint& at) {

@@ -6,18 +6,12 @@
 
 #include "include/TracePoint.h"
 #include "zrclient/Instrumentation.h"
+#include "zrclient/NodeLexicon.h"
 
 /// What the four element iterators share. Each is a plain class with a cursor on
 /// the network interfaces, a list of filters and a flag that there are any; these
 /// are the steps that more than one of them takes.
 namespace ZR::DHCPClientProvider {
-
-/// The description of the node above the service processor's interfaces.
-inline constexpr const char* serviceProcessorDescription = "BMC";
-/// The name of the service processor as a computer.
-inline constexpr const char* serviceProcessorName = "BMC:-1";
-/// What stands for any other computer in an identifier.
-inline constexpr const char* computerDescription = "Computer";
 
 /// The description of the node two levels above the cursor's; empty when it cannot
 /// be read. Traced as a variable of the name given.

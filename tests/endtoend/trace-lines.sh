@@ -43,7 +43,7 @@ ask() {
     printf '== %s\n' "$*" | tee -a "$work/log" >>"$work/trace"
     # A request that fails writes lines, too.
     ZR_LOG_SINK=file:$work/log ZR_LOG_LEVEL=0 ZR_TRACE_SINK=file:$work/trace ZR_TRACE_LEVEL=0 \
-        "$program" --tree "$work/tree.json" --data-dir "$work/data" "$@" >"$work/answer" 2>&1 || true
+        "$program" --tree "$work/tree.json" --data-dir "$work/data" "$@" >"$work/response" 2>&1 || true
 }
 
 # Standard input without the steps that were told before.
@@ -58,7 +58,7 @@ mapfile -t classes < <("$program" --tree "$work/tree.json" --format json classes
 ((${#classes[@]} > 10))
 for class in "${classes[@]}"; do
     ask names "$class"
-    mapfile -t paths < <(grep "^.*$class\\." "$work/answer" || true)
+    mapfile -t paths < <(grep "^.*$class\\." "$work/response" || true)
     ask instances "$class"
     for path in "${paths[@]}"; do
         ask get "$path"

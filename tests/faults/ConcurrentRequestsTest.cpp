@@ -63,10 +63,11 @@ class Concurrency : public ::testing::Test {
         for (unsigned round = 0; round < rounds; ++round) {
             // Each thread begins elsewhere, and all come to all.
             const std::size_t i = (first * 7 + round) % script().size();
-            const ScriptAnswer answer = host.run(script()[i]);
-            if (std::find(serial_[i].begin(), serial_[i].end(), answer) == serial_[i].end()) {
+            const ScriptResponse response = host.run(script()[i]);
+            if (std::find(serial_[i].begin(), serial_[i].end(), response) == serial_[i].end()) {
                 const std::lock_guard lock(mutex_);
-                ADD_FAILURE() << script()[i].name << " had no state with the response\n" << answer;
+                ADD_FAILURE() << script()[i].name << " had no state with the response\n"
+                              << response;
             }
         }
     }
@@ -75,7 +76,7 @@ class Concurrency : public ::testing::Test {
     ZR::Testing::TemporaryDirectory directory_;
     std::string data_ = directory_ / "data/";
     std::string configurationFile_ = data_ + "ifcfg-eth0";
-    std::vector<std::vector<ScriptAnswer>> serial_;
+    std::vector<std::vector<ScriptResponse>> serial_;
     std::mutex mutex_;
 };
 

@@ -156,7 +156,7 @@ std::uintmax_t FaultSweep::logSize() const {
     return std::filesystem::file_size(log_);
 }
 
-ScriptAnswer FaultSweep::runUndisturbed(const ScriptRequest& request) {
+ScriptResponse FaultSweep::runUndisturbed(const ScriptRequest& request) {
     ZR::Testing::writeFile(configurationFile_, oldContent);
     return host_->run(request);
 }
@@ -174,7 +174,7 @@ void FaultSweep::prepare(const ScriptRequest& request) {
     ASSERT_GT(logSize(), 0U);
     for (unsigned round = 0; round < 4; ++round) {
         enterNextState();
-        usual_.at(state_).answer = runUndisturbed(request);
+        usual_.at(state_).response = runUndisturbed(request);
         usual_.at(state_).blocks = blocksAfter(request);
     }
     descriptors_ = openDescriptors();
@@ -191,24 +191,24 @@ void FaultSweep::enterNextState() {
 }
 
 bool FaultSweep::failOnce(const ScriptRequest& request, const Fault& fault,
-                          const std::function<bool(ScriptAnswer&)>& failing) {
+                          const std::function<bool(ScriptResponse&)>& failing) {
     SCOPED_TRACE(fault.what);
     const auto failOnceMore = [&] {
         enterNextState();
         ZR::Testing::writeFile(configurationFile_, oldContent);
         const std::uintmax_t before = logSize();
-        ScriptAnswer answer;
-        const bool failed = failing(answer);
+        ScriptResponse response;
+        const bool failed = failing(response);
         if (failed) {
-            expectTruth(request, answer, logSize() > before, fault);
+            expectTruth(request, response, logSize() > before, fault);
             expectOneContent();
             if (fault.misinforms) {
                 machine_.enter(state_);
             }
-            EXPECT_EQ(runUndisturbed(request), usual_.at(state_).answer) << "the next request";
+            EXPECT_EQ(runUndisturbed(request), usual_.at(state_).response) << "the next request";
             EXPECT_LE(openDescriptors(), descriptors_);
         } else {
-            EXPECT_EQ(answer, usual_.at(state_).answer);
+            EXPECT_EQ(response, usual_.at(state_).response);
         }
         return failed;
     };
@@ -232,27 +232,27 @@ bool FaultSweep::failOnce(const ScriptRequest& request, const Fault& fault,
     return true;
 }
 
-void FaultSweep::expectTruth(const ScriptRequest& request, const ScriptAnswer& answer, bool logged,
-                             const Fault& fault) {
-    const ScriptAnswer& usual = usual_.at(state_).answer;
-    EXPECT_THAT(answer.message, ::testing::Not(::testing::HasSubstr("exception")));
-    if (answer == usual) {
+void FaultSweep::expectTruth(const ScriptRequest& request, const ScriptResponse& response,
+                             bool logged, const Fault& fault) {
+    const ScriptResponse& usual = usual_.at(state_).response;
+    EXPECT_THAT(response.message, ::testing::Not(::testing::HasSubstr("exception")));
+    if (response == usual) {
         return;
     }
-    const bool nothingFound = request.operation == Operation::get && answer.objects.empty() &&
-                              answer.code == CMPI_RC_ERR_NOT_FOUND;
-    EXPECT_TRUE(answer.code == usual.code || nothingFound) << answer.code;
+    const bool nothingFound = request.operation == Operation::get && response.objects.empty() &&
+                              response.code == CMPI_RC_ERR_NOT_FOUND;
+    EXPECT_TRUE(response.code == usual.code || nothingFound) << response.code;
     if (fault.misinforms || fault.ofName) {
         return;  // what follows from it is right
     }
-    const bool some = areAmong(answer.objects, usual.objects);
+    const bool some = areAmong(response.objects, usual.objects);
     if (fault.ofMemory) {
-        EXPECT_TRUE(some) << ::testing::PrintToString(answer.objects);
+        EXPECT_TRUE(some) << ::testing::PrintToString(response.objects);
     }
-    const bool readsConfiguration = some && answer.objects.size() == usual.objects.size();
+    const bool readsConfiguration = some && response.objects.size() == usual.objects.size();
     EXPECT_TRUE(logged || readsConfiguration || (fault.ofMemory && isSilent(request)))
         << "not a word in the log, and the response is "
-        << ::testing::PrintToString(answer.objects);
+        << ::testing::PrintToString(response.objects);
 }
 
 void FaultSweep::expectOneContent() {
@@ -265,16 +265,16 @@ unsigned FaultSweep::failAllocations(const ScriptRequest& request) {
     unsigned number = 1;
     for (;; ++number) {
         const Fault fault{"allocation " + std::to_string(number), false, true};
-        const bool failed = failOnce(request, fault, [&](ScriptAnswer& answer) {
+        const bool failed = failOnce(request, fault, [&](ScriptResponse& response) {
             const Allocations allocations(origin_, number);
-            answer = host_->run(request);
+            response = host_->run(request);
             return allocations.count() >= number;
         });
         if (!failed || ::testing::Test::HasFailure()) {
             break;
         }
     }
-    EXPECT_EQ(runUndisturbed(request), usual_.at(state_).answer);
+    EXPECT_EQ(runUndisturbed(request), usual_.at(state_).response);
     return number - 1;
 }
 
@@ -288,10 +288,10 @@ unsigned FaultSweep::failSystemCalls(const ScriptRequest& request) {
                 const Fault fault{std::string(nameOf(call)) + ' ' + std::to_string(number) + ": " +
                                       errorText(error),
                                   misinforms(call, error), false, call == Call::gethostname};
-                const bool failed = failOnce(request, fault, [&](ScriptAnswer& answer) {
+                const bool failed = failOnce(request, fault, [&](ScriptResponse& response) {
                     SystemCalls calls(origin_);
                     calls.fail(call, number, error);
-                    answer = host_->run(request);
+                    response = host_->run(request);
                     return calls.failed();
                 });
                 if (!failed || ::testing::Test::HasFailure()) {
@@ -301,7 +301,7 @@ unsigned FaultSweep::failSystemCalls(const ScriptRequest& request) {
             }
         }
     }
-    EXPECT_EQ(runUndisturbed(request), usual_.at(state_).answer);
+    EXPECT_EQ(runUndisturbed(request), usual_.at(state_).response);
     return failures;
 }
 

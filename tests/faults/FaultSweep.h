@@ -40,7 +40,7 @@ class FaultSweep {
   private:
     /// What is known about a request that meets no failure, in each state.
     struct Usual {
-        ScriptAnswer answer;
+        ScriptResponse response;
         std::int64_t blocks = 0;
     };
     struct Fault {
@@ -54,11 +54,11 @@ class FaultSweep {
     void enterNextState();
     /// False when the request ended without meeting the failure.
     bool failOnce(const ScriptRequest& request, const Fault& fault,
-                  const std::function<bool(ScriptAnswer&)>& failing);
-    void expectTruth(const ScriptRequest& request, const ScriptAnswer& answer, bool logged,
+                  const std::function<bool(ScriptResponse&)>& failing);
+    void expectTruth(const ScriptRequest& request, const ScriptResponse& response, bool logged,
                      const Fault& fault);
     void expectOneContent();
-    ScriptAnswer runUndisturbed(const ScriptRequest& request);
+    ScriptResponse runUndisturbed(const ScriptRequest& request);
     std::int64_t blocksAfter(const ScriptRequest& request);
     std::uintmax_t logSize() const;
 

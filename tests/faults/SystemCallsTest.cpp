@@ -87,10 +87,10 @@ TEST(SystemCallsOfTheLibrary, AreCountedAndPassedOnWhereATreeIsRead) {
     machine.enter(0);
     ProviderHost host;
     const CallOrigin origin(ProviderHost::library);
-    const ScriptAnswer before = host.run(servers);
+    const ScriptResponse before = host.run(servers);
     machine.enter(1);
     SystemCalls calls(origin);
-    const ScriptAnswer after = host.run(servers);
+    const ScriptResponse after = host.run(servers);
     EXPECT_EQ(before.objects.size(), 1U);
     EXPECT_EQ(after.objects.size(), 3U);
     for (const Call call : {Call::close, Call::fstat, Call::gethostname, Call::inotify_add_watch,

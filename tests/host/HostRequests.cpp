@@ -79,17 +79,17 @@ Texts textsOf(Operation operation, const cimom::InstancesResult& result) {
     return textsOf(operation, result.status.code, present(result.instances));
 }
 
-Texts textsOf(Operation operation, const StrictHost::Answer& answer) {
-    return answer.instances.empty() ? textsOf(operation, answer.code, answer.paths)
-                                    : textsOf(operation, answer.code, answer.instances);
+Texts textsOf(Operation operation, const StrictHost::Response& response) {
+    return response.instances.empty() ? textsOf(operation, response.code, response.paths)
+                                      : textsOf(operation, response.code, response.instances);
 }
 
 /// The instance that the path names, of all that a get delivers: the provider's filters
 /// are loose, and what an object manager makes of several is its own affair.
-StrictHost::Answer ofPath(const cimom::ObjectPath& path, StrictHost::Answer answer) {
-    std::erase_if(answer.instances,
+StrictHost::Response ofPath(const cimom::ObjectPath& path, StrictHost::Response response) {
+    std::erase_if(response.instances,
                   [&](const cimom::Instance& instance) { return !(instance.path == path); });
-    return answer;
+    return response;
 }
 
 const char* nameOf(Operation operation) {

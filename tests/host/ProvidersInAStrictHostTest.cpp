@@ -40,7 +40,7 @@ class ProvidersInAStrictHostTest : public test::TreeTest {
   protected:
     struct Expectation {
         HostRequest request;
-        Texts answer;
+        Texts response;
     };
 
     static void setMachine() {
@@ -73,8 +73,8 @@ class ProvidersInAStrictHostTest : public test::TreeTest {
         // knows one broker only.
         manager_ = manage();
         for (HostRequest& request : strict::allRequests(*manager_)) {
-            Texts answer = strict::ask(*manager_, request);
-            expected_.push_back({std::move(request), std::move(answer)});
+            Texts response = strict::ask(*manager_, request);
+            expected_.push_back({std::move(request), std::move(response)});
         }
         manager_.reset();
     }
@@ -88,7 +88,8 @@ class ProvidersInAStrictHostTest : public test::TreeTest {
 
     void expectTheSame(StrictHost& host, const char** properties = nullptr) const {
         for (const Expectation& one : expected_) {
-            EXPECT_EQ(strict::ask(host, one.request, properties), one.answer) << one.request.name();
+            EXPECT_EQ(strict::ask(host, one.request, properties), one.response)
+                << one.request.name();
         }
     }
 
@@ -174,7 +175,7 @@ TEST_F(ProvidersInAStrictHostTest, AreUnloadedWhenIdleAndAnswerTheSameWhenLoaded
     StrictHost host = makeHost();
     for (int round = 0; round < 3; ++round) {
         for (std::size_t i = 0; i < expected_.size(); i += 7) {
-            EXPECT_EQ(strict::ask(host, expected_[i].request), expected_[i].answer)
+            EXPECT_EQ(strict::ask(host, expected_[i].request), expected_[i].response)
                 << expected_[i].request.name();
         }
         EXPECT_TRUE(host.unload()) << "a library stays in the process";
@@ -192,7 +193,7 @@ TEST_F(ProvidersInAStrictHostTest, AnswerManyThreadsAtOnce) {
             // Each asks a third of all, and all ask different things at a time.
             for (std::size_t at = number % 3; at < expected_.size(); at += 3) {
                 const Expectation& one = expected_[at];
-                if (strict::ask(host, one.request) != one.answer) {
+                if (strict::ask(host, one.request) != one.response) {
                     ++wrong;
                 }
             }
@@ -226,9 +227,9 @@ TEST_F(ProvidersInAStrictHostTest, ChangeWhatTheyChangeInTheEmbeddedObjectManage
     }
     const cimom::ObjectPath eth0 =
         cimom::parseObjectPath("root/cimv2:QVXZR_DHCPSettingData.InstanceID=\"Computer%eth0\"");
-    const StrictHost::Answer answer = host.get(eth0);
-    ASSERT_EQ(answer.instances.size(), 1U);
-    EXPECT_EQ(*answer.instances[0].property("ConfigurationName"), cimom::Value::ofString("new"));
+    const StrictHost::Response response = host.get(eth0);
+    ASSERT_EQ(response.instances.size(), 1U);
+    EXPECT_EQ(*response.instances[0].property("ConfigurationName"), cimom::Value::ofString("new"));
 }
 
 TEST_F(ProvidersInAStrictHostTest, AReferenceOfAnEndpointThatThereIsNotLacksItsKey) {
@@ -353,7 +354,7 @@ TEST_F(ProvidersInAStrictHostTest, KeysInLowerCaseNameTheSameInstance) {
                 return static_cast<char>(std::tolower(static_cast<unsigned char>(letter)));
             });
         }
-        EXPECT_EQ(strict::ask(host, request), one.answer) << request.name();
+        EXPECT_EQ(strict::ask(host, request), one.response) << request.name();
     }
 }
 

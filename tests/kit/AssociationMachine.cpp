@@ -37,12 +37,12 @@ std::string brief(const std::optional<cimom::ObjectPath>& path) {
     return text;
 }
 
-Texts briefs(const Host::Answer& answer) {
+Texts briefs(const Host::Response& response) {
     Texts texts;
-    for (const auto& path : answer.paths) {
+    for (const auto& path : response.paths) {
         texts.push_back(brief(path));
     }
-    for (const auto& instance : answer.instances) {
+    for (const auto& instance : response.instances) {
         texts.push_back(instance ? brief(instance->path) : "null");
     }
     return texts;

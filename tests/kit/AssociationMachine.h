@@ -15,7 +15,7 @@ using Texts = std::vector<std::string>;
 std::string brief(const std::optional<cimom::ObjectPath>& path);
 
 /// All that a response has, paths or instances.
-Texts briefs(const Host::Answer& answer);
+Texts briefs(const Host::Response& response);
 
 /// A path of the default namespace from its text, with this host's name for "@".
 cimom::ObjectPath pathFrom(const std::string& text);

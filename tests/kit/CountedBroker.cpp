@@ -149,7 +149,7 @@ CMPIData faultData() {
     return data;
 }
 
-/// A call that answers a value and writes the status.
+/// A call that returns a value and writes the status.
 template <typename Result, typename Body>
 Result call(Function function, CMPIStatus* rc, const Result& nothing, const Body& body) {
     if (!failsNow(function)) {
@@ -161,7 +161,7 @@ Result call(Function function, CMPIStatus* rc, const Result& nothing, const Body
     return nothing;
 }
 
-/// A call that answers a status.
+/// A call that returns a status.
 template <typename Body>
 CMPIStatus call(Function function, const Body& body) {
     return failsNow(function) ? faultStatus() : body();
@@ -413,7 +413,7 @@ const char* nameOf(Function function) {
     return names[static_cast<std::size_t>(function)];
 }
 
-bool canAnswerNull(Function function) {
+bool canReturnNull(Function function) {
     switch (function) {
         case Function::addKey:
         case Function::setProperty:

@@ -51,14 +51,14 @@ const char* nameOf(Function function);
 /// What a function does in place of its work.
 enum class Fault {
     none,
-    null,       ///< answers nothing (a null pointer, no value, 0), with status OK
-    status,     ///< answers nothing, with an error status
+    null,       ///< gives nothing (a null pointer, no value, 0), with status OK
+    status,     ///< gives nothing, with an error status
     exception,  ///< throws a standard exception, as C++ behind a table might
 };
 
-/// Whether a function can answer nothing while its status is OK: one that answers a
+/// Whether a function can return nothing while its status is OK: one that returns a
 /// status alone cannot.
-bool canAnswerNull(Function function);
+bool canReturnNull(Function function);
 
 /// A broker that hands every call on to a real one, counts it, and can let one of
 /// them fail. All objects that it gives out are stand-ins for the real broker's, so

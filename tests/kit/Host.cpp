@@ -41,25 +41,25 @@ Host::~Host() {
     associationMI_->ft->cleanup(associationMI_, nullptr, 1);
 }
 
-Host::Answer Host::enumerateNames(const cimom::ObjectPath& path) {
+Host::Response Host::enumerateNames(const cimom::ObjectPath& path) {
     return request(Kind::paths, path, [&](auto* context, auto* result, auto* record) {
         return instanceTable().enumerateInstanceNames(instanceMI_, context, result, record);
     });
 }
 
-Host::Answer Host::enumerate(const cimom::ObjectPath& path, const char** properties) {
+Host::Response Host::enumerate(const cimom::ObjectPath& path, const char** properties) {
     return request(Kind::instances, path, [&](auto* context, auto* result, auto* record) {
         return instanceTable().enumerateInstances(instanceMI_, context, result, record, properties);
     });
 }
 
-Host::Answer Host::get(const cimom::ObjectPath& path) {
+Host::Response Host::get(const cimom::ObjectPath& path) {
     return request(Kind::instances, path, [&](auto* context, auto* result, auto* record) {
         return instanceTable().getInstance(instanceMI_, context, result, record, nullptr);
     });
 }
 
-Host::Answer Host::modify(const cimom::ObjectPath& path, const cimom::Instance* instance) {
+Host::Response Host::modify(const cimom::ObjectPath& path, const cimom::Instance* instance) {
     return request(Kind::instances, path, [&](auto* context, auto* result, auto* record) {
         const CMPIInstance* newInstanceRecord =
             instance == nullptr
@@ -74,30 +74,30 @@ Host::Answer Host::modify(const cimom::ObjectPath& path, const cimom::Instance* 
     });
 }
 
-Host::Answer Host::associatorNames(const cimom::ObjectPath& path, const char* assocClass,
-                                   const char* resultClass) {
+Host::Response Host::associatorNames(const cimom::ObjectPath& path, const char* assocClass,
+                                     const char* resultClass) {
     return request(Kind::paths, path, [&](auto* context, auto* result, auto* record) {
         return associationTable().associatorNames(associationMI_, context, result, record,
                                                   assocClass, resultClass, nullptr, nullptr);
     });
 }
 
-Host::Answer Host::associators(const cimom::ObjectPath& path, const char* assocClass,
-                               const char* resultClass) {
+Host::Response Host::associators(const cimom::ObjectPath& path, const char* assocClass,
+                                 const char* resultClass) {
     return request(Kind::instances, path, [&](auto* context, auto* result, auto* record) {
         return associationTable().associators(associationMI_, context, result, record, assocClass,
                                               resultClass, nullptr, nullptr, nullptr);
     });
 }
 
-Host::Answer Host::referenceNames(const cimom::ObjectPath& path, const char* resultClass) {
+Host::Response Host::referenceNames(const cimom::ObjectPath& path, const char* resultClass) {
     return request(Kind::paths, path, [&](auto* context, auto* result, auto* record) {
         return associationTable().referenceNames(associationMI_, context, result, record,
                                                  resultClass, nullptr);
     });
 }
 
-Host::Answer Host::references(const cimom::ObjectPath& path, const char* resultClass) {
+Host::Response Host::references(const cimom::ObjectPath& path, const char* resultClass) {
     return request(Kind::instances, path, [&](auto* context, auto* result, auto* record) {
         return associationTable().references(associationMI_, context, result, record, resultClass,
                                              nullptr, nullptr);
@@ -138,9 +138,9 @@ std::optional<std::uint64_t> numberOf(const cimom::Instance& instance, const std
     return read<std::uint64_t>(instance.property(name));
 }
 
-std::vector<std::string> keysOf(const Host::Answer& answer, const std::string& name) {
+std::vector<std::string> keysOf(const Host::Response& response, const std::string& name) {
     std::vector<std::string> values;
-    for (const auto& path : answer.paths) {
+    for (const auto& path : response.paths) {
         values.push_back(path ? keyOf(*path, name).value_or("(none)") : "(null)");
     }
     return values;

@@ -27,7 +27,7 @@ namespace test {
 /// not what an object manager makes of it. One at a time.
 class Host {
   public:
-    struct Answer {
+    struct Response {
         CMPIrc code = CMPI_RC_OK;
         bool hasMessage = false;
         std::vector<std::optional<cimom::ObjectPath>> paths;
@@ -59,22 +59,22 @@ class Host {
         return *associationMI_->ft;
     }
 
-    Answer enumerateNames(const cimom::ObjectPath& path);
-    Answer enumerate(const cimom::ObjectPath& path, const char** properties = nullptr);
-    Answer get(const cimom::ObjectPath& path);
-    Answer modify(const cimom::ObjectPath& path, const cimom::Instance* instance);
-    Answer associatorNames(const cimom::ObjectPath& path, const char* assocClass,
-                           const char* resultClass = nullptr);
-    Answer associators(const cimom::ObjectPath& path, const char* assocClass,
-                       const char* resultClass = nullptr);
-    Answer referenceNames(const cimom::ObjectPath& path, const char* resultClass);
-    Answer references(const cimom::ObjectPath& path, const char* resultClass);
+    Response enumerateNames(const cimom::ObjectPath& path);
+    Response enumerate(const cimom::ObjectPath& path, const char** properties = nullptr);
+    Response get(const cimom::ObjectPath& path);
+    Response modify(const cimom::ObjectPath& path, const cimom::Instance* instance);
+    Response associatorNames(const cimom::ObjectPath& path, const char* assocClass,
+                             const char* resultClass = nullptr);
+    Response associators(const cimom::ObjectPath& path, const char* assocClass,
+                         const char* resultClass = nullptr);
+    Response referenceNames(const cimom::ObjectPath& path, const char* resultClass);
+    Response references(const cimom::ObjectPath& path, const char* resultClass);
 
     enum class Kind { paths, instances };
 
     /// Runs something in a request of its own: `call(context, result, path)`.
     template <typename Call>
-    Answer request(Kind kind, const cimom::ObjectPath& path, const Call& call) {
+    Response request(Kind kind, const cimom::ObjectPath& path, const Call& call) {
         const cimom::broker::RequestScope scope;
         cimom::CollectedObjects<cimom::ObjectPath> paths;
         cimom::CollectedObjects<cimom::Instance> instances;
@@ -120,6 +120,6 @@ std::optional<std::string> textOf(const cimom::Instance& instance, const std::st
 std::optional<std::uint64_t> numberOf(const cimom::Instance& instance, const std::string& name);
 
 /// The values of one text key, of each path in its order.
-std::vector<std::string> keysOf(const Host::Answer& answer, const std::string& name);
+std::vector<std::string> keysOf(const Host::Response& response, const std::string& name);
 
 }  // namespace test

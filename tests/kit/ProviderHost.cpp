@@ -94,18 +94,18 @@ std::string textOf(const std::optional<cimom::Instance>& instance) {
 }
 
 template <typename Objects>
-ScriptAnswer answerOf(const cimom::Status& status, const Objects& objects) {
-    ScriptAnswer answer{status.code, status.message, {}};
+ScriptResponse responseOf(const cimom::Status& status, const Objects& objects) {
+    ScriptResponse response{status.code, status.message, {}};
     for (const auto& object : objects) {
-        answer.objects.push_back(textOf(object));
+        response.objects.push_back(textOf(object));
     }
-    return answer;
+    return response;
 }
-ScriptAnswer answerOf(const cimom::PathsResult& result) {
-    return answerOf(result.status, result.paths);
+ScriptResponse responseOf(const cimom::PathsResult& result) {
+    return responseOf(result.status, result.paths);
 }
-ScriptAnswer answerOf(const cimom::InstancesResult& result) {
-    return answerOf(result.status, result.instances);
+ScriptResponse responseOf(const cimom::InstancesResult& result) {
+    return responseOf(result.status, result.instances);
 }
 
 }  // namespace
@@ -139,7 +139,7 @@ ProviderHost::ProviderHost(const std::string& directory)
 
 ProviderHost::~ProviderHost() = default;
 
-ScriptAnswer ProviderHost::run(const ScriptRequest& request) {
+ScriptResponse ProviderHost::run(const ScriptRequest& request) {
     const cimom::ObjectPath path = pathOf(request.path);
     if (request.direct) {
         return runDirectly(request, path);
@@ -152,22 +152,22 @@ ScriptAnswer ProviderHost::run(const ScriptRequest& request) {
     referring.resultClass = wanted.assocClass;
     switch (request.operation) {
         case Operation::enumerateNames:
-            return answerOf(manager_.enumerateInstanceNames(path));
+            return responseOf(manager_.enumerateInstanceNames(path));
         case Operation::enumerate:
-            return answerOf(manager_.enumerateInstances(path));
+            return responseOf(manager_.enumerateInstances(path));
         case Operation::get:
-            return answerOf(manager_.getInstance(path));
+            return responseOf(manager_.getInstance(path));
         case Operation::modify:
-            return answerOf(manager_.modifyInstance(
+            return responseOf(manager_.modifyInstance(
                 {path, {{"ConfigurationName", cimom::Value::ofString("new")}}}));
         case Operation::associatorNames:
-            return answerOf(manager_.associatorNames(path, wanted));
+            return responseOf(manager_.associatorNames(path, wanted));
         case Operation::associators:
-            return answerOf(manager_.associators(path, wanted));
+            return responseOf(manager_.associators(path, wanted));
         case Operation::referenceNames:
-            return answerOf(manager_.referenceNames(path, referring));
+            return responseOf(manager_.referenceNames(path, referring));
         case Operation::references:
-            return answerOf(manager_.references(path, referring));
+            return responseOf(manager_.references(path, referring));
         case Operation::create:
         case Operation::remove:
         case Operation::query:
@@ -176,8 +176,8 @@ ScriptAnswer ProviderHost::run(const ScriptRequest& request) {
     throw std::logic_error("the object manager has no such operation");
 }
 
-ScriptAnswer ProviderHost::runDirectly(const ScriptRequest& request,
-                                       const cimom::ObjectPath& path) {
+ScriptResponse ProviderHost::runDirectly(const ScriptRequest& request,
+                                         const cimom::ObjectPath& path) {
     const CMPIInstanceMIFT& table = *instance_->ft;
     const auto ask = [&](const CMPIContext* context, const CMPIResult* result,
                          const CMPIObjectPath* record) -> CMPIStatus {
@@ -198,7 +198,7 @@ ScriptAnswer ProviderHost::runDirectly(const ScriptRequest& request,
     cimom::CollectedObjects<cimom::Instance> instances;
     const cimom::CallOutcome outcome =
         cimom::callProvider({&manager_.repository(), "", 0}, &instances, "provider", path, ask);
-    return answerOf(outcome.status, instances.objects);
+    return responseOf(outcome.status, instances.objects);
 }
 
 }  // namespace test

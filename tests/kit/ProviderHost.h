@@ -14,17 +14,17 @@
 namespace test {
 
 /// What a request gave, as text that can be compared and printed.
-struct ScriptAnswer {
+struct ScriptResponse {
     int code = 0;
     std::string message;
     std::vector<std::string> objects;  ///< a path, or a path and its properties, each
 
-    bool operator==(const ScriptAnswer&) const = default;
+    bool operator==(const ScriptResponse&) const = default;
 };
 
-inline std::ostream& operator<<(std::ostream& out, const ScriptAnswer& answer) {
-    out << "status " << answer.code << ' ' << answer.message << '\n';
-    for (const std::string& object : answer.objects) {
+inline std::ostream& operator<<(std::ostream& out, const ScriptResponse& response) {
+    out << "status " << response.code << ' ' << response.message << '\n';
+    for (const std::string& object : response.objects) {
         out << object << '\n';
     }
     return out;
@@ -41,7 +41,7 @@ class ProviderHost {
     ProviderHost(const ProviderHost&) = delete;
     ProviderHost& operator=(const ProviderHost&) = delete;
 
-    ScriptAnswer run(const ScriptRequest& request);
+    ScriptResponse run(const ScriptRequest& request);
 
     /// The file name of the library.
     static constexpr const char* library = "libDHCPClientProvider.so";
@@ -51,7 +51,7 @@ class ProviderHost {
     struct Closed {
         void operator()(void* handle) const noexcept;
     };
-    ScriptAnswer runDirectly(const ScriptRequest& request, const cimom::ObjectPath& path);
+    ScriptResponse runDirectly(const ScriptRequest& request, const cimom::ObjectPath& path);
 
     cimom::ObjectManager manager_;
     // For what the object manager does not offer: the same library's table, asked with

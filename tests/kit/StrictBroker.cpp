@@ -92,7 +92,7 @@ CMPIEnumeration* enumerateInstances(const CMPIBroker* broker, const CMPIContext*
         return nullptr;
     }
     StrictHost& host = StrictHost::of(broker);
-    StrictHost::Answer given = host.enumerate(object->model, properties);
+    StrictHost::Response given = host.enumerate(object->model, properties);
     setStatus(status, given.code);
     return given.code == CMPI_RC_OK ? RequestObjects::make<EnumerationObject>(
                                           host.repository(), std::move(given.instances))
@@ -107,7 +107,7 @@ CMPIInstance* getInstance(const CMPIBroker* broker, const CMPIContext* context,
         return nullptr;
     }
     StrictHost& host = StrictHost::of(broker);
-    StrictHost::Answer given = host.get(object->model, properties);
+    StrictHost::Response given = host.get(object->model, properties);
     // OK without an instance is one that was not found.
     const CMPIrc code =
         given.code == CMPI_RC_OK && given.instances.empty() ? CMPI_RC_ERR_NOT_FOUND : given.code;

@@ -46,7 +46,7 @@ CMPIStatus callSlot(const char* name, Slot slot, Arguments... arguments) {
     return {CMPI_RC_ERR_FAILED, nullptr};
 }
 
-void append(StrictHost::Answer& all, StrictHost::Answer one) {
+void append(StrictHost::Response& all, StrictHost::Response one) {
     // The first error is the result, and what was handed over before it is discarded.
     if (all.code != CMPI_RC_OK || one.code != CMPI_RC_OK) {
         all = {all.code == CMPI_RC_OK ? one.code : all.code, {}, {}};
@@ -154,7 +154,8 @@ void* StrictHost::symbol(const std::string& location, const std::string& name) c
     return ::dlsym(libraries_.at(location).handle, name.c_str());
 }
 
-StrictHost::Answer StrictHost::request(Kind kind, const cimom::ObjectPath& path, const Call& call) {
+StrictHost::Response StrictHost::request(Kind kind, const cimom::ObjectPath& path,
+                                         const Call& call) {
     const RequestObjects objects;
     auto* result = RequestObjects::make<ResultObject>(repository_, kind);
     const CMPIStatus status =
@@ -177,11 +178,11 @@ const StrictHost::Library* StrictHost::serving(const std::string& className) con
     return nullptr;
 }
 
-StrictHost::Answer StrictHost::eachClass(
+StrictHost::Response StrictHost::eachClass(
     Kind kind, const cimom::ObjectPath& path,
     const std::function<CMPIStatus(const Library&, const CMPIContext*, const CMPIResult*,
                                    const CMPIObjectPath*)>& call) {
-    Answer all;
+    Response all;
     for (const cimom::Registration& registration : registrations_) {
         if (!registration.instance || !repository_.isA(registration.className, path.className)) {
             continue;
@@ -196,14 +197,14 @@ StrictHost::Answer StrictHost::eachClass(
     return all;
 }
 
-StrictHost::Answer StrictHost::enumerateNames(const cimom::ObjectPath& path) {
+StrictHost::Response StrictHost::enumerateNames(const cimom::ObjectPath& path) {
     return eachClass(Kind::paths, path, [](auto& library, auto* context, auto* result, auto* op) {
         return callSlot("enumerateInstanceNames", library.instance->ft->enumerateInstanceNames,
                         library.instance, context, result, op);
     });
 }
 
-StrictHost::Answer StrictHost::enumerate(const cimom::ObjectPath& path, const char** properties) {
+StrictHost::Response StrictHost::enumerate(const cimom::ObjectPath& path, const char** properties) {
     return eachClass(
         Kind::instances, path, [=](auto& library, auto* context, auto* result, auto* op) {
             return callSlot("enumerateInstances", library.instance->ft->enumerateInstances,
@@ -211,7 +212,7 @@ StrictHost::Answer StrictHost::enumerate(const cimom::ObjectPath& path, const ch
         });
 }
 
-StrictHost::Answer StrictHost::ofClass(
+StrictHost::Response StrictHost::ofClass(
     Kind kind, const cimom::ObjectPath& path,
     const std::function<CMPIStatus(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
                                    const CMPIObjectPath*)>& call) {
@@ -224,13 +225,13 @@ StrictHost::Answer StrictHost::ofClass(
     });
 }
 
-StrictHost::Answer StrictHost::get(const cimom::ObjectPath& path, const char** properties) {
+StrictHost::Response StrictHost::get(const cimom::ObjectPath& path, const char** properties) {
     return ofClass(Kind::instances, path, [=](auto* mi, auto* context, auto* result, auto* op) {
         return callSlot("getInstance", mi->ft->getInstance, mi, context, result, op, properties);
     });
 }
 
-StrictHost::Answer StrictHost::create(const cimom::Instance& instance) {
+StrictHost::Response StrictHost::create(const cimom::Instance& instance) {
     return ofClass(Kind::paths, instance.path,
                    [&](auto* mi, auto* context, auto* result, auto* op) {
                        return callSlot("createInstance", mi->ft->createInstance, mi, context,
@@ -238,7 +239,7 @@ StrictHost::Answer StrictHost::create(const cimom::Instance& instance) {
                    });
 }
 
-StrictHost::Answer StrictHost::modify(const cimom::Instance& instance, const char** properties) {
+StrictHost::Response StrictHost::modify(const cimom::Instance& instance, const char** properties) {
     return ofClass(Kind::nothing, instance.path,
                    [&](auto* mi, auto* context, auto* result, auto* op) {
                        return callSlot("modifyInstance", mi->ft->modifyInstance, mi, context,
@@ -250,24 +251,24 @@ const CMPIInstance* StrictHost::newInstance(const cimom::Instance& instance) con
     return RequestObjects::make<InstanceObject>(repository_, instance);
 }
 
-StrictHost::Answer StrictHost::remove(const cimom::ObjectPath& path) {
+StrictHost::Response StrictHost::remove(const cimom::ObjectPath& path) {
     return ofClass(Kind::nothing, path, [](auto* mi, auto* context, auto* result, auto* op) {
         return callSlot("deleteInstance", mi->ft->deleteInstance, mi, context, result, op);
     });
 }
 
-StrictHost::Answer StrictHost::query(const cimom::ObjectPath& path, const char* text,
-                                     const char* language) {
+StrictHost::Response StrictHost::query(const cimom::ObjectPath& path, const char* text,
+                                       const char* language) {
     return ofClass(Kind::instances, path, [=](auto* mi, auto* context, auto* result, auto* op) {
         return callSlot("execQuery", mi->ft->execQuery, mi, context, result, op, text, language);
     });
 }
 
-StrictHost::Answer StrictHost::eachAssociator(
+StrictHost::Response StrictHost::eachAssociator(
     Kind kind, const cimom::ObjectPath& path,
     const std::function<CMPIStatus(CMPIAssociationMI*, const CMPIContext*, const CMPIResult*,
                                    const CMPIObjectPath*)>& call) {
-    Answer all;
+    Response all;
     for (const auto& entry : libraries_) {
         CMPIAssociationMI* mi = entry.second.association;
         if (mi != nullptr) {
@@ -279,16 +280,16 @@ StrictHost::Answer StrictHost::eachAssociator(
     return all;
 }
 
-StrictHost::Answer StrictHost::associatorNames(const cimom::ObjectPath& path,
-                                               const Filter& filter) {
+StrictHost::Response StrictHost::associatorNames(const cimom::ObjectPath& path,
+                                                 const Filter& filter) {
     return eachAssociator(Kind::paths, path, [&](auto* mi, auto* context, auto* result, auto* op) {
         return callSlot("associatorNames", mi->ft->associatorNames, mi, context, result, op,
                         filter.association, filter.resultClass, filter.role, filter.resultRole);
     });
 }
 
-StrictHost::Answer StrictHost::associators(const cimom::ObjectPath& path, const Filter& filter,
-                                           const char** properties) {
+StrictHost::Response StrictHost::associators(const cimom::ObjectPath& path, const Filter& filter,
+                                             const char** properties) {
     return eachAssociator(Kind::instances, path,
                           [&](auto* mi, auto* context, auto* result, auto* op) {
                               return callSlot("associators", mi->ft->associators, mi, context,
@@ -297,15 +298,16 @@ StrictHost::Answer StrictHost::associators(const cimom::ObjectPath& path, const 
                           });
 }
 
-StrictHost::Answer StrictHost::referenceNames(const cimom::ObjectPath& path, const Filter& filter) {
+StrictHost::Response StrictHost::referenceNames(const cimom::ObjectPath& path,
+                                                const Filter& filter) {
     return eachAssociator(Kind::paths, path, [&](auto* mi, auto* context, auto* result, auto* op) {
         return callSlot("referenceNames", mi->ft->referenceNames, mi, context, result, op,
                         filter.association, filter.role);
     });
 }
 
-StrictHost::Answer StrictHost::references(const cimom::ObjectPath& path, const Filter& filter,
-                                          const char** properties) {
+StrictHost::Response StrictHost::references(const cimom::ObjectPath& path, const Filter& filter,
+                                            const char** properties) {
     return eachAssociator(Kind::instances, path,
                           [&](auto* mi, auto* context, auto* result, auto* op) {
                               return callSlot("references", mi->ft->references, mi, context, result,

@@ -29,7 +29,7 @@ class StrictHost {
     /// Whether contexts have their usual entries, or none.
     enum class Contexts { filled, empty };
 
-    struct Answer {
+    struct Response {
         CMPIrc code = CMPI_RC_OK;
         std::vector<cimom::ObjectPath> paths;
         std::vector<cimom::Instance> instances;
@@ -53,13 +53,13 @@ class StrictHost {
     /// one of them is still in the process afterwards.
     bool unload(bool terminating = false);
 
-    Answer enumerateNames(const cimom::ObjectPath& path);
-    Answer enumerate(const cimom::ObjectPath& path, const char** properties = nullptr);
-    Answer get(const cimom::ObjectPath& path, const char** properties = nullptr);
-    Answer create(const cimom::Instance& instance);
-    Answer modify(const cimom::Instance& instance, const char** properties = nullptr);
-    Answer remove(const cimom::ObjectPath& path);
-    Answer query(const cimom::ObjectPath& path, const char* text, const char* language);
+    Response enumerateNames(const cimom::ObjectPath& path);
+    Response enumerate(const cimom::ObjectPath& path, const char** properties = nullptr);
+    Response get(const cimom::ObjectPath& path, const char** properties = nullptr);
+    Response create(const cimom::Instance& instance);
+    Response modify(const cimom::Instance& instance, const char** properties = nullptr);
+    Response remove(const cimom::ObjectPath& path);
+    Response query(const cimom::ObjectPath& path, const char* text, const char* language);
 
     /// What association requests may name, or not.
     struct Filter {
@@ -68,12 +68,12 @@ class StrictHost {
         const char* role = nullptr;
         const char* resultRole = nullptr;
     };
-    Answer associatorNames(const cimom::ObjectPath& path, const Filter& filter);
-    Answer associators(const cimom::ObjectPath& path, const Filter& filter,
-                       const char** properties = nullptr);
-    Answer referenceNames(const cimom::ObjectPath& path, const Filter& filter);
-    Answer references(const cimom::ObjectPath& path, const Filter& filter,
-                      const char** properties = nullptr);
+    Response associatorNames(const cimom::ObjectPath& path, const Filter& filter);
+    Response associators(const cimom::ObjectPath& path, const Filter& filter,
+                         const char** properties = nullptr);
+    Response referenceNames(const cimom::ObjectPath& path, const Filter& filter);
+    Response references(const cimom::ObjectPath& path, const Filter& filter,
+                        const char** properties = nullptr);
 
     /// A symbol of a registered library; null when it does not export it.
     [[nodiscard]] void* symbol(const std::string& location, const std::string& name) const;
@@ -81,7 +81,7 @@ class StrictHost {
     /// Runs something as a request: `call(context, result, path)`.
     using Call =
         std::function<CMPIStatus(const CMPIContext*, const CMPIResult*, const CMPIObjectPath*)>;
-    Answer request(ResultObject::Kind kind, const cimom::ObjectPath& path, const Call& call);
+    Response request(ResultObject::Kind kind, const cimom::ObjectPath& path, const Call& call);
 
     /// The host of a broker record.
     static StrictHost& of(const CMPIBroker* broker);
@@ -99,18 +99,19 @@ class StrictHost {
     /// The library of a class that is registered itself.
     const Library* serving(const std::string& className) const;
     /// Calls the provider of each registered class at or below the path's, with that class.
-    Answer eachClass(
+    Response eachClass(
         ResultObject::Kind kind, const cimom::ObjectPath& path,
         const std::function<CMPIStatus(const Library&, const CMPIContext*, const CMPIResult*,
                                        const CMPIObjectPath*)>& call);
     /// Calls each provider of associations once.
-    Answer eachAssociator(
+    Response eachAssociator(
         ResultObject::Kind kind, const cimom::ObjectPath& path,
         const std::function<CMPIStatus(CMPIAssociationMI*, const CMPIContext*, const CMPIResult*,
                                        const CMPIObjectPath*)>& call);
-    Answer ofClass(ResultObject::Kind kind, const cimom::ObjectPath& path,
-                   const std::function<CMPIStatus(CMPIInstanceMI*, const CMPIContext*,
-                                                  const CMPIResult*, const CMPIObjectPath*)>& call);
+    Response ofClass(
+        ResultObject::Kind kind, const cimom::ObjectPath& path,
+        const std::function<CMPIStatus(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
+                                       const CMPIObjectPath*)>& call);
     const CMPIContext* context(const std::string& nameSpace) const;
     [[nodiscard]] const CMPIInstance* newInstance(const cimom::Instance& instance) const;
 

@@ -277,7 +277,7 @@ CMPIStatus returnInstance(const CMPIResult* result, const CMPIInstance* instance
         return {CMPI_RC_ERR_INVALID_PARAMETER, nullptr};
     }
     if (object->kind != ResultObject::Kind::instances) {
-        violations().add("returnInstance answers a request that is not for instances");
+        violations().add("returnInstance responds to a request that is not for instances");
     }
     checkDelivered(*object->repository, delivered->model);
     object->instances.push_back(withDefaults(*object->repository, delivered->model));
@@ -291,7 +291,7 @@ CMPIStatus returnObjectPath(const CMPIResult* result, const CMPIObjectPath* path
         return {CMPI_RC_ERR_INVALID_PARAMETER, nullptr};
     }
     if (object->kind != ResultObject::Kind::paths) {
-        violations().add("returnObjectPath answers a request that is not for paths");
+        violations().add("returnObjectPath responds to a request that is not for paths");
     }
     checkDelivered(*object->repository, delivered->model);
     object->paths.push_back(delivered->model);

@@ -29,7 +29,7 @@ bool hasType(const cimom::ClassRepository& repository, const std::string& classN
              const std::string& property, CMPIType type, const char* function);
 
 /// A path must have all keys of its class, none of them null, and no others; an
-/// instance its references as well. Object managers answer nothing at all otherwise.
+/// instance its references as well. Object managers return nothing at all otherwise.
 void checkDelivered(const cimom::ClassRepository& repository, const cimom::ObjectPath& path);
 void checkDelivered(const cimom::ClassRepository& repository, const cimom::Instance& instance);
 

@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
 # Carries out what a page shows: each command of its console blocks prints what stands
 # below it, and "cat FILE" shows the file that the others use. The hosts of the page are
-# real servers on this machine, with TLS, users and, one of them, nobody listening.
+# real servers on this machine, with TLS, users and, behind one of them, no server.
 # Usage: fleet-page.sh PROGRAM PAGE TREE
 set -euo pipefail
 
@@ -50,7 +50,7 @@ start() { # NAME TREE PASSWORD
 }
 start alpha "$tree" "correct horse"
 start beta beta.json secret
-# Of the ports of the protocol suite, nobody answers this one here.
+# Of the ports of the protocol suite, no server listens on this one here.
 substitutions+=(gamma.example 127.0.0.1:1)
 
 toReal() {
@@ -107,7 +107,7 @@ for index in "${!commands[@]}"; do
             found=$(toPage <found)
             ;;
     esac
-    # Which server answers first is not the page's to say.
+    # Which server responds first is not the page's to say.
     if diff <(sort <<<"${outputs[index]%$'\n'}") <(sort <<<"$found") >difference; then
         echo "ok: $command"
     else

@@ -25,12 +25,15 @@ struct IpconfigResult {
     std::optional<IpAddress> address;
     std::optional<IpAddress> server;  ///< of the boot files, the best guess at the DHCP server
     std::uint32_t leaseTime = 0;      ///< seconds; 0 and UINT32_MAX: for ever
+    /// When the response came, in seconds since the start of the system.
+    std::optional<std::uint32_t> uptime{};
 
     bool operator==(const IpconfigResult&) const = default;
 };
 [[nodiscard]] IpconfigResult parseIpconfig(std::string_view text);
 
-/// Adds what ipconfig was given.
+/// Adds what ipconfig was given. Its files tell times since the start of the system, which
+/// do not depend on a clock that was set since.
 void readIpconfig(const Roots& roots, ClientFacts& facts);
 
 }  // namespace ZR::Live

@@ -6,6 +6,7 @@
 #include <cstddef>
 #include <utility>
 
+#include "clients/Managers.h"
 #include "formats/Files.h"
 #include "formats/KeyFile.h"
 #include "formats/NetworkdLease.h"
@@ -42,8 +43,15 @@ void addAddresses(std::string_view value, std::vector<IpAddress>& addresses) {
 
 struct ProfileFile {
     std::string path;
+    std::int64_t written = 0;  // epoch seconds
     NetworkManagerProfile profile;
 };
+
+/// When a file was last written, in seconds since the epoch; 0 when it is gone.
+std::int64_t timeOf(const std::string& path) {
+    struct stat status {};
+    return ::stat(path.c_str(), &status) == 0 ? status.st_mtim.tv_sec : 0;
+}
 
 std::vector<ProfileFile> readProfiles(const Roots& roots, ClientFacts& facts) {
     std::vector<ProfileFile> profiles;
@@ -52,43 +60,27 @@ std::vector<ProfileFile> readProfiles(const Roots& roots, ClientFacts& facts) {
         for (const std::string& name : listOptionalDirectory(place, facts.diagnostics)) {
             std::string path = pathIn(place, name);
             if (const auto text = readOptionalFile(path, facts.diagnostics)) {
-                profiles.push_back(
-                    {.path = std::move(path), .profile = parseNetworkManagerProfile(*text)});
+                const std::int64_t written = timeOf(path);
+                profiles.push_back({.path = std::move(path),
+                                    .written = written,
+                                    .profile = parseNetworkManagerProfile(*text)});
             }
         }
     }
     return profiles;
 }
 
-/// What a profile says. An unknown method says nothing.
 LinkConfiguration configurationOf(const ProfileFile& file) {
-    const NetworkManagerProfile& profile = file.profile;
-    LinkConfiguration configuration{.client = Client::NetworkManager,
-                                    .dhcp4 = {},
-                                    .dhcp6 = {},
-                                    .staticAddresses = profile.addresses4,
-                                    .origin = file.path};
-    const std::string& method = profile.method4;
-    if (method == "auto") {
-        configuration.dhcp4 = true;
-    } else if (method == "manual" || method == "link-local" || method == "shared" ||
-               method == "disabled") {
-        configuration.dhcp4 = false;
-        configuration.linkLocal4 = method == "link-local";
-        configuration.other4 = method == "shared";
-    }
-    // With "auto" the routers of the link decide whether DHCPv6 is used.
-    if (profile.method6 == "dhcp") {
-        configuration.dhcp6 = true;
-    } else if (!profile.method6.empty() && profile.method6 != "auto") {
-        configuration.dhcp6 = false;
-    }
+    LinkConfiguration configuration = networkManagerConfiguration(file.profile);
+    configuration.origin = file.path;
     return configuration;
 }
 
+/// `applied`: when the state of the device was written, which is after its profile was
+/// applied. What was written to the profile since then was not.
 void addManagement(std::uint32_t ifindex, const NetworkManagerDevice& device,
-                   const std::string& origin, const std::vector<ProfileFile>& profiles,
-                   ClientFacts& facts) {
+                   const std::string& origin, std::int64_t applied,
+                   const std::vector<ProfileFile>& profiles, ClientFacts& facts) {
     LinkConfiguration management{.client = Client::NetworkManager,
                                  .dhcp4 = {},
                                  .dhcp6 = {},
@@ -102,15 +94,18 @@ void addManagement(std::uint32_t ifindex, const NetworkManagerDevice& device,
         if (active->profile.external) {
             return;
         }
-        management = configurationOf(*active);
+        if (active->written <= applied) {
+            management = configurationOf(*active);
+        }
     }
     management.ifindex = ifindex;
     // Without the right to read the profile, a lease tells of it; without a lease,
     // DHCP may still be on its way.
-    if (device.dhcp4) {
+    if (!device.options4.empty()) {
         management.dhcp4 = true;
     }
-    if (device.dhcp6) {
+    // DHCPv6 may have given other things than an address.
+    if (device.options6.contains("ip6_address")) {
         management.dhcp6 = true;
     }
     facts.managements.push_back(std::move(management));
@@ -124,24 +119,24 @@ void readDevices(const Roots& roots, const std::vector<ProfileFile>& profiles, C
     const std::string devices = roots.path(networkManagerDevices);
     for (const std::string& name : listOptionalDirectory(devices, facts.diagnostics)) {
         const auto ifindex = parseNumber<std::uint32_t>(name);
-        std::string path = pathIn(devices, name);
+        const std::string path = pathIn(devices, name);
         const auto text = ifindex ? readOptionalFile(path, facts.diagnostics) : std::nullopt;
         if (!text) {
             continue;
         }
         const NetworkManagerDevice device = parseNetworkManagerDevice(*text);
         if (alive && device.managed) {
-            addManagement(*ifindex, device, path, profiles, facts);
+            addManagement(*ifindex, device, path, timeOf(path), profiles, facts);
         }
-        if (device.address4) {
-            facts.leases.push_back({.client = Client::NetworkManager,
-                                    .interfaceName = {},
-                                    .ifindex = *ifindex,
-                                    .address = *device.address4,
-                                    .server = device.server4,
-                                    .clientAlive = alive,
-                                    .expires = device.expires4,
-                                    .origin = std::move(path)});
+        for (auto& lease :
+             {networkManagerLease4(device.options4), networkManagerLease6(device.options6)}) {
+            if (lease) {
+                Lease& added = facts.leases.emplace_back(*lease);
+                added.ifindex = *ifindex;
+                added.clientAlive = alive && device.managed;
+                added.pid = pidOfManager(facts, Client::NetworkManager);
+                added.origin = path;
+            }
         }
     }
 }
@@ -177,6 +172,8 @@ void readInternalLeases(const Roots& roots, ClientFacts& facts) {
 }  // namespace
 
 NetworkManagerDevice parseNetworkManagerDevice(std::string_view text) {
+    constexpr std::string_view prefix4 = "dhcp4.";
+    constexpr std::string_view prefix6 = "dhcp6.";
     NetworkManagerDevice device;
     forEachKey(text, [&](std::string_view section, std::string_view key, std::string_view value) {
         if (section == "device") {
@@ -185,18 +182,10 @@ NetworkManagerDevice parseNetworkManagerDevice(std::string_view text) {
             } else if (key == "connection-uuid") {
                 device.profile = value;
             }
-        } else if (section == "dhcp4") {
-            device.dhcp4 = true;
-            if (key == "dhcp4.ip_address") {
-                device.address4 = IpAddress::ipv4FromText(value);
-            } else if (key == "dhcp4.dhcp_server_identifier") {
-                device.server4 = IpAddress::ipv4FromText(value);
-            } else if (key == "dhcp4.expiry") {
-                // A time that cannot be read is over.
-                device.expires4 = parseNumber<std::int64_t>(value).value_or(0);
-            }
-        } else if (section == "dhcp6") {
-            device.dhcp6 = true;
+        } else if (section == "dhcp4" && key.starts_with(prefix4)) {
+            device.options4.emplace(key.substr(prefix4.size()), value);
+        } else if (section == "dhcp6" && key.starts_with(prefix6)) {
+            device.options6.emplace(key.substr(prefix6.size()), value);
         }
     });
     return device;
@@ -224,6 +213,29 @@ NetworkManagerProfile parseNetworkManagerProfile(std::string_view text) {
         }
     });
     return profile;
+}
+
+LinkConfiguration networkManagerConfiguration(const NetworkManagerProfile& profile) {
+    LinkConfiguration configuration{.client = Client::NetworkManager,
+                                    .dhcp4 = {},
+                                    .dhcp6 = {},
+                                    .staticAddresses = profile.addresses4};
+    const std::string& method = profile.method4;
+    if (method == "auto") {
+        configuration.dhcp4 = true;
+    } else if (method == "manual" || method == "link-local" || method == "shared" ||
+               method == "disabled") {
+        configuration.dhcp4 = false;
+        configuration.linkLocal4 = method == "link-local";
+        configuration.other4 = method == "shared";
+    }
+    // With "auto" the routers of the link decide whether DHCPv6 is used.
+    if (profile.method6 == "dhcp") {
+        configuration.dhcp6 = true;
+    } else if (!profile.method6.empty() && profile.method6 != "auto") {
+        configuration.dhcp6 = false;
+    }
+    return configuration;
 }
 
 std::optional<InterfaceName> internalLeaseInterface(std::string_view fileName) {

@@ -7,6 +7,7 @@
 #include <string_view>
 #include <vector>
 
+#include "clients/NetworkManagerLease.h"
 #include "facts/ClientFacts.h"
 #include "formats/InterfaceName.h"
 #include "formats/IpAddress.h"
@@ -25,18 +26,15 @@ inline constexpr std::array<std::string_view, 3> networkManagerProfiles{
 /// The state file of one device, /run/NetworkManager/devices/IFINDEX.
 struct NetworkManagerDevice {
     bool managed = false;
-    std::string profile;                   ///< UUID of the active connection; empty for none
-    bool dhcp4 = false;                    ///< there is a DHCPv4 lease
-    bool dhcp6 = false;                    ///< there is a DHCPv6 lease
-    std::optional<IpAddress> address4;     ///< leased
-    std::optional<IpAddress> server4;      ///< DHCP option 54
-    std::int64_t expires4 = Lease::never;  ///< epoch seconds; the file names no infinite one
+    std::string profile;               ///< UUID of the active connection; empty for none
+    NetworkManagerOptions options4{};  ///< of the DHCPv4 lease; empty for none
+    NetworkManagerOptions options6{};  ///< of what DHCPv6 gave; empty for nothing
 
     bool operator==(const NetworkManagerDevice&) const = default;
 };
 [[nodiscard]] NetworkManagerDevice parseNetworkManagerDevice(std::string_view text);
 
-/// A connection profile: a key file NAME.nmconnection.
+/// A connection profile: a key file NAME.nmconnection, or what was applied of one.
 struct NetworkManagerProfile {
     std::string uuid;  ///< empty when the program derives it from the file's name
     std::optional<InterfaceName> interfaceName;
@@ -49,11 +47,14 @@ struct NetworkManagerProfile {
 };
 [[nodiscard]] NetworkManagerProfile parseNetworkManagerProfile(std::string_view text);
 
+/// What a profile says of a link's addresses. A method that is not known says nothing.
+[[nodiscard]] LinkConfiguration networkManagerConfiguration(const NetworkManagerProfile& profile);
+
 /// The interface in the name internal-UUID-INTERFACE.lease; nullopt for other names.
 [[nodiscard]] std::optional<InterfaceName> internalLeaseInterface(std::string_view fileName);
 
-/// Adds leases, managements and profiles. Needs the processes to be in the facts:
-/// the state files outlive the program.
+/// Adds leases, managements and profiles, as far as its files tell. Needs the processes to
+/// be in the facts: the state files outlive the program.
 void readNetworkManager(const Roots& roots, ClientFacts& facts);
 
 }  // namespace ZR::Live

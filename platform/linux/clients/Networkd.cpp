@@ -1,10 +1,14 @@
 #include "clients/Networkd.h"
 
+#include <sys/stat.h>
+
 #include <algorithm>
 #include <cstddef>
+#include <cstdint>
 #include <map>
 #include <utility>
 
+#include "clients/Managers.h"
 #include "formats/Files.h"
 #include "formats/NetworkFile.h"
 #include "formats/NetworkdLease.h"
@@ -15,14 +19,32 @@
 namespace ZR::Live {
 namespace {
 
+/// When a file was last written, in seconds since the epoch; 0 when it is gone.
+std::int64_t timeOf(const std::string& path) {
+    struct stat status {};
+    return ::stat(path.c_str(), &status) == 0 ? status.st_mtim.tv_sec : 0;
+}
+
 /// The text of a .network file and its drop-ins, each path read once per reading:
 /// one file often serves many links.
 class NetworkFiles {
   public:
     NetworkFiles(const Roots& roots, ClientFacts& facts) : roots_(roots), facts_(facts) {}
 
-    /// nullopt when the file cannot be read, so that nothing is known.
-    const std::optional<NetworkFile>& settings(const std::string& path) {
+    /// nullopt when the file cannot be read, so that nothing is known, and when it or a
+    /// drop-in was written later than `applied`: networkd may not have read that.
+    std::optional<NetworkFile> settings(const std::string& path, std::int64_t applied) {
+        const auto& found = find(path);
+        return found && found->written <= applied ? std::optional{found->settings} : std::nullopt;
+    }
+
+  private:
+    struct Found {
+        NetworkFile settings;
+        std::int64_t written = 0;  // epoch seconds, of the newest
+    };
+
+    const std::optional<Found>& find(const std::string& path) {
         const auto known = read_.find(path);
         if (known != read_.end()) {
             return known->second;
@@ -30,8 +52,7 @@ class NetworkFiles {
         return read_.emplace(path, read(path)).first->second;
     }
 
-  private:
-    std::optional<NetworkFile> read(const std::string& path) {
+    std::optional<Found> read(const std::string& path) {
         const std::size_t slash = path.rfind('/');
         if (path.empty() || path.front() != '/') {
             return std::nullopt;
@@ -42,14 +63,15 @@ class NetworkFiles {
         if (!text) {
             return std::nullopt;
         }
-        NetworkFile settings;
-        applyNetworkFile(*text, settings);
+        Found found{.settings = {}, .written = timeOf(roots_.path(path))};
+        applyNetworkFile(*text, found.settings);
         for (const auto& [dropIn, file] : dropIns(name)) {
             if (const auto more = readOptionalFile(file, facts_.diagnostics)) {
-                applyNetworkFile(*more, settings);
+                applyNetworkFile(*more, found.settings);
+                found.written = std::max(found.written, timeOf(file));
             }
         }
-        return settings;
+        return found;
     }
 
     /// Drop-in names in the order in which they apply, with their paths.
@@ -75,8 +97,47 @@ class NetworkFiles {
 
     const Roots& roots_;
     ClientFacts& facts_;
-    std::map<std::string, std::optional<NetworkFile>> read_;
+    std::map<std::string, std::optional<Found>> read_;
 };
+
+void tellDamage(const std::string& path, const std::string& damage, ClientFacts& facts) {
+    facts.diagnostics.emplace_back("cannot use all of " + path + ": " + damage,
+                                   Diagnostic::Kind::Damaged);
+}
+
+/// What networkd says of one link in its state file, and of how it was told to configure it.
+std::optional<LinkConfiguration> readLink(const Roots& roots, const std::string& path,
+                                          std::uint32_t ifindex, NetworkFiles& files,
+                                          ClientFacts& facts) {
+    const auto text = readOptionalFile(path, facts.diagnostics);
+    if (!text) {
+        return std::nullopt;
+    }
+    const NetworkdLink link = parseNetworkdLink(*text);
+    if (!link.damage.empty()) {
+        tellDamage(path, link.damage, facts);
+    }
+    if (!link.managed()) {
+        return std::nullopt;
+    }
+    LinkConfiguration found{.client = Client::Networkd,
+                            .ifindex = ifindex,
+                            .dhcp4 = {},
+                            .dhcp6 = {},
+                            .staticAddresses = {},
+                            .origin = path};
+    if (link.networkFile.empty()) {
+        return found;
+    }
+    if (auto settings = files.settings(link.networkFile, timeOf(path))) {
+        found.dhcp4 = settings->dhcp4;
+        found.dhcp6 = settings->dhcp6;
+        found.staticAddresses = std::move(settings->addresses);
+        found.linkLocal4 = settings->linkLocal4;
+        found.origin = roots.path(link.networkFile);
+    }
+    return found;
+}
 
 }  // namespace
 
@@ -88,11 +149,16 @@ bool NetworkdLink::managed() const noexcept {
 NetworkdLink parseNetworkdLink(std::string_view text) {
     NetworkdLink link;
     for (PropertyLine& line : parsePropertyLines(text)) {
-        if (line.key == "ADMIN_STATE") {
+        if (line.key.empty() && link.damage.empty()) {
+            link.damage = "line " + std::to_string(line.line) + ": not of the form KEY=value";
+        } else if (line.key == "ADMIN_STATE") {
             link.adminState = std::move(line.value);
         } else if (line.key == "NETWORK_FILE") {
             link.networkFile = std::move(line.value);
         }
+    }
+    if (link.adminState.empty() && link.damage.empty()) {
+        link.damage = "no ADMIN_STATE";
     }
     return link;
 }
@@ -104,44 +170,30 @@ void readNetworkd(const Roots& roots, ClientFacts& facts) {
     if (facts.runsElsewhere(Client::Networkd)) {
         return;
     }
+    const bool alive = facts.runs(Client::Networkd);
     std::vector<std::uint32_t> managed;
     for (const std::string& name : listOptionalDirectory(links, facts.diagnostics)) {
         const auto ifindex = parseNumber<std::uint32_t>(name);
-        const auto text =
-            ifindex ? readOptionalFile(pathIn(links, name), facts.diagnostics) : std::nullopt;
-        if (!text) {
-            continue;
+        auto found =
+            ifindex ? readLink(roots, pathIn(links, name), *ifindex, files, facts) : std::nullopt;
+        if (found) {
+            managed.push_back(*ifindex);
+            (alive ? facts.managements : facts.configurations).push_back(*std::move(found));
         }
-        const NetworkdLink link = parseNetworkdLink(*text);
-        if (!link.managed()) {
-            continue;
-        }
-        managed.push_back(*ifindex);
-        LinkConfiguration management{.client = Client::Networkd,
-                                     .ifindex = *ifindex,
-                                     .dhcp4 = {},
-                                     .dhcp6 = {},
-                                     .staticAddresses = {},
-                                     .origin = pathIn(links, name)};
-        if (!link.networkFile.empty()) {
-            if (const auto& settings = files.settings(link.networkFile)) {
-                management.dhcp4 = settings->dhcp4;
-                management.dhcp6 = settings->dhcp6;
-                management.staticAddresses = settings->addresses;
-                management.linkLocal4 = settings->linkLocal4;
-                management.origin = roots.path(link.networkFile);
-            }
-        }
-        facts.managements.push_back(std::move(management));
     }
     for (const std::string& name : listOptionalDirectory(leases, facts.diagnostics)) {
         const auto ifindex = parseNumber<std::uint32_t>(name);
-        const auto text =
-            ifindex ? readOptionalFile(pathIn(leases, name), facts.diagnostics) : std::nullopt;
+        const std::string path = pathIn(leases, name);
+        const auto text = ifindex ? readOptionalFile(path, facts.diagnostics) : std::nullopt;
         if (!text) {
             continue;
         }
-        const NetworkdLease lease = parseNetworkdLease(*text);
+        NetworkdLease lease = parseNetworkdLease(*text);
+        if (!lease.damage.empty()) {
+            tellDamage(path, lease.damage, facts);
+        } else if (!lease.address) {
+            tellDamage(path, "no ADDRESS", facts);
+        }
         if (!lease.address) {
             continue;
         }
@@ -152,10 +204,14 @@ void readNetworkd(const Roots& roots, ClientFacts& facts) {
              .ifindex = *ifindex,
              .address = *lease.address,
              .server = lease.server,
-             .clientAlive = std::find(managed.begin(), managed.end(), *ifindex) != managed.end(),
+             .clientAlive =
+                 alive && std::find(managed.begin(), managed.end(), *ifindex) != managed.end(),
              // The file says how long, not since when; it goes when the lease goes.
              .expires = endless ? std::optional{Lease::never} : std::nullopt,
-             .origin = pathIn(leases, name)});
+             .options = std::move(lease.options),
+             .clientIdentifier = std::move(lease.clientIdentifier),
+             .pid = pidOfManager(facts, Client::Networkd),
+             .origin = path});
     }
 }
 

@@ -22,6 +22,7 @@ inline constexpr std::array<std::string_view, 4> networkFileDirectories{
 struct NetworkdLink {
     std::string adminState;   ///< "configured", "unmanaged", ...
     std::string networkFile;  ///< absolute path; empty when none was matched
+    std::string damage{};     ///< what is wrong with the text; empty for nothing
 
     /// Whether networkd configures the link.
     [[nodiscard]] bool managed() const noexcept;
@@ -30,8 +31,8 @@ struct NetworkdLink {
 };
 [[nodiscard]] NetworkdLink parseNetworkdLink(std::string_view text);
 
-/// Adds leases and managements of all links that networkd knows. Needs the
-/// processes to be in the facts.
+/// Adds leases and managements of all links that networkd knows. What a networkd that has
+/// ended left of them are configurations. Needs the processes to be in the facts.
 void readNetworkd(const Roots& roots, ClientFacts& facts);
 
 }  // namespace ZR::Live

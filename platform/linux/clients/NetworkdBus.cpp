@@ -3,60 +3,54 @@
 #include <sys/socket.h>
 
 #include <algorithm>
-#include <array>
-#include <cerrno>
 #include <cstddef>
-#include <memory>
-#include <nlohmann/json.hpp>
+#include <ctime>
 #include <optional>
 #include <utility>
 
-#include "clients/SdBus.h"
-#include "formats/SystemErrors.h"
+#include "clients/JsonValues.h"
+#include "clients/Managers.h"
+#include "formats/Hexadecimal.h"
 
 namespace ZR::Live {
 namespace {
 
 using Json = nlohmann::json;
-using Deadline = std::chrono::steady_clock::time_point;
+using Microseconds = std::optional<std::uint64_t>;
 
-constexpr const char* service = "org.freedesktop.network1";
 constexpr std::string_view origin = "D-Bus org.freedesktop.network1";
+constexpr std::int64_t second = 1'000'000;
 
-/// The address in an array of the numbers of its bytes; nullopt for anything else.
-std::optional<IpAddress> addressOf(const Json& value, int family) {
+/// The bytes in an array of their numbers; empty for anything else.
+std::vector<std::byte> bytesOf(const Json& value) {
     std::vector<std::byte> bytes;
     if (!value.is_array()) {
-        return std::nullopt;
+        return {};
     }
     for (const Json& number : value) {
         if (!number.is_number_unsigned() || number.get<std::uint64_t>() > UINT8_MAX) {
-            return std::nullopt;
+            return {};
         }
         bytes.push_back(static_cast<std::byte>(number.get<std::uint8_t>()));
     }
-    return IpAddress::fromBytes(family, bytes);
+    return bytes;
 }
 
-/// The member of an object; null where it has none, or is not an object.
-const Json& member(const Json& object, const char* name) {
-    static const Json none;
-    if (!object.is_object()) {
-        return none;
+/// A time, by either of the spellings that versions have of its name. 0 and the largest
+/// number stand for none.
+Microseconds timeOf(const Json& object, const char* name, const char* olderName = "") {
+    for (const char* const each : {name, olderName}) {
+        const std::uint64_t time = numberOf(member(object, each));
+        if (time != 0 && time != UINT64_MAX) {
+            return time;
+        }
     }
-    const auto found = object.find(name);
-    return found == object.end() ? none : *found;
+    return std::nullopt;
 }
 
-std::string textOf(const Json& value) {
-    return value.is_string() ? value.get<std::string>() : std::string{};
-}
-
-void addAddresses(const Json& link, std::vector<NetworkdAddress>& addresses) {
-    const Json& index = member(link, "Index");
-    const Json& list = member(link, "Addresses");
-    if (!index.is_number_unsigned() || index.get<std::uint64_t>() > UINT32_MAX ||
-        !list.is_array()) {
+void addAddresses(const Json& list, std::uint32_t ifindex,
+                  std::vector<NetworkdAddress>& addresses) {
+    if (!list.is_array()) {
         return;
     }
     for (const Json& each : list) {
@@ -65,175 +59,154 @@ void addAddresses(const Json& link, std::vector<NetworkdAddress>& addresses) {
             continue;
         }
         const int family = number.get<std::uint8_t>();
-        if (const auto address = addressOf(member(each, "Address"), family)) {
-            addresses.push_back({.ifindex = index.get<std::uint32_t>(),
-                                 .address = *address,
-                                 .source = textOf(member(each, "ConfigSource")),
-                                 .provider = addressOf(member(each, "ConfigProvider"), family)});
+        if (const auto address = IpAddress::fromBytes(family, bytesOf(member(each, "Address")))) {
+            addresses.push_back(
+                {.ifindex = ifindex,
+                 .address = *address,
+                 .source = textOf(member(each, "ConfigSource")),
+                 .provider = IpAddress::fromBytes(family, bytesOf(member(each, "ConfigProvider"))),
+                 .validUntil = timeOf(each, "ValidLifetimeUSec", "ValidLifetimeUsec")});
         }
     }
 }
 
-struct CloseBus {
-    void operator()(sd_bus* bus) const noexcept { SdBus::get()->closeUnref(bus); }
-};
-using Bus = std::unique_ptr<sd_bus, CloseBus>;
-
-struct UnrefMessage {
-    void operator()(sd_bus_message* message) const noexcept { SdBus::get()->messageUnref(message); }
-};
-using BusMessage = std::unique_ptr<sd_bus_message, UnrefMessage>;
-
-/// Frees what a failed call leaves.
-class BusError {
-  public:
-    BusError() = default;
-    BusError(const BusError&) = delete;
-    BusError& operator=(const BusError&) = delete;
-    ~BusError() { SdBus::get()->errorFree(&error_); }
-
-    sd_bus_error* get() noexcept { return &error_; }
-    [[nodiscard]] bool is(const char* name) const noexcept {
-        return SdBus::get()->errorHasName(&error_, name) != 0;
+void addClient(const Json& client, std::uint32_t ifindex, bool ipv6,
+               std::vector<NetworkdClient>& clients) {
+    if (!client.is_object()) {
+        return;
     }
-
-  private:
-    sd_bus_error error_{};
-};
-
-/// Microseconds to a deadline; 0 when it has passed.
-std::uint64_t left(Deadline deadline) {
-    const auto time = std::chrono::duration_cast<std::chrono::microseconds>(
-        deadline - std::chrono::steady_clock::now());
-    return static_cast<std::uint64_t>(std::max<std::int64_t>(time.count(), 0));
+    const Json& lease = member(client, "Lease");
+    clients.push_back(
+        {.ifindex = ifindex,
+         .ipv6 = ipv6,
+         .obtained = timeOf(lease, "LeaseTimestampUSec"),
+         .renews = timeOf(lease, "Timeout1USec"),
+         .rebinds = timeOf(lease, "Timeout2USec"),
+         .identifier = hexadecimal(bytesOf(member(client, ipv6 ? "DUID" : "ClientIdentifier")))});
 }
 
-/// Waits until the bus has accepted the connection. The library's own calls would wait for
-/// that without a limit. Returns an errno, 0 for none.
-int awaitReady(sd_bus* bus, Deadline deadline) {
-    for (;;) {
-        const int ready = SdBus::get()->isReady(bus);
-        if (ready != 0) {
-            return ready < 0 ? -ready : 0;
-        }
-        const int done = SdBus::get()->process(bus, nullptr);
-        if (done < 0) {
-            return -done;
-        }
-        if (done == 0) {
-            const std::uint64_t time = left(deadline);
-            if (time == 0) {
-                return ETIMEDOUT;
-            }
-            if (const int waited = SdBus::get()->wait(bus, time); waited < 0 && waited != -EINTR) {
-                return -waited;
-            }
+void addLink(const Json& link, NetworkdDescription& description) {
+    const Json& index = member(link, "Index");
+    if (!index.is_number_unsigned() || index.get<std::uint64_t>() > UINT32_MAX) {
+        return;
+    }
+    const auto ifindex = index.get<std::uint32_t>();
+    addAddresses(member(link, "Addresses"), ifindex, description.addresses);
+    addClient(member(link, "DHCPv4Client"), ifindex, false, description.clients);
+    addClient(member(link, "DHCPv6Client"), ifindex, true, description.clients);
+}
+
+/// Seconds since the epoch, to the nearest: the two clocks are not read at the same moment.
+std::optional<std::int64_t> since(std::int64_t start, const Microseconds& time) {
+    constexpr std::uint64_t largest = std::uint64_t{1} << 61U;
+    if (!time || *time > largest) {
+        return std::nullopt;
+    }
+    return (start + static_cast<std::int64_t>(*time) + second / 2) / second;
+}
+
+void addLease(const NetworkdAddress& address, const NetworkdDescription& description,
+              std::int64_t start, ClientFacts& facts) {
+    const auto known =
+        std::find_if(facts.leases.begin(), facts.leases.end(), [&](const Lease& lease) {
+            return lease.client == Client::Networkd && lease.ifindex == address.ifindex &&
+                   lease.address == address.address;
+        });
+    Lease& lease = known != facts.leases.end()
+                       ? *known
+                       : facts.leases.emplace_back(Lease{.client = Client::Networkd,
+                                                         .interfaceName = {},
+                                                         .ifindex = address.ifindex,
+                                                         .address = address.address,
+                                                         .server = address.provider,
+                                                         .expires = {},
+                                                         .origin = std::string{origin}});
+    lease.clientAlive = true;
+    lease.pid = pidOfManager(facts, Client::Networkd);
+    if (!lease.expires) {
+        lease.expires = since(start, address.validUntil);
+    }
+    const auto client = std::find_if(
+        description.clients.begin(), description.clients.end(), [&](const NetworkdClient& each) {
+            return each.ifindex == address.ifindex && each.ipv6 != address.address.isIPv4();
+        });
+    if (client != description.clients.end()) {
+        lease.obtained = since(start, client->obtained);
+        lease.renews = since(start, client->renews);
+        lease.rebinds = since(start, client->rebinds);
+        if (lease.clientIdentifier.empty()) {
+            lease.clientIdentifier = client->identifier;
         }
     }
-}
-
-NetworkdResponse failure(const std::string& reason) {
-    return {.json = {}, .reason = "systemd-networkd cannot be asked: " + reason};
-}
-
-NetworkdResponse failure(int error) {
-    return failure(reasonOf(error));
 }
 
 }  // namespace
 
-Parsed<std::vector<NetworkdAddress>> parseNetworkdDescription(std::string_view json) {
+Parsed<NetworkdDescription> parseNetworkdDescription(std::string_view json) {
     const Json document = Json::parse(json, nullptr, false);
     if (!document.is_object()) {
         return std::string_view{"not a JSON object"};
     }
-    std::vector<NetworkdAddress> addresses;
+    NetworkdDescription description;
     const Json& links = member(document, "Interfaces");
     if (links.is_array()) {
         for (const Json& link : links) {
-            addAddresses(link, addresses);
+            addLink(link, description);
         }
     } else {
-        addAddresses(document, addresses);
+        addLink(document, description);
     }
-    return addresses;
+    return description;
 }
 
-NetworkdResponse askNetworkd(Deadline deadline) {
-    const std::shared_ptr<const SdBus> functions = SdBus::get();
-    if (!functions->missing().empty()) {
-        return failure(functions->missing());
-    }
-    sd_bus* opened = nullptr;
-    const int open = functions->openSystem(&opened);
-    const Bus bus{opened};
-    if (open < 0) {
-        // Many a machine has networkd and no bus.
-        return open == -ENOENT || open == -ECONNREFUSED ? NetworkdResponse{} : failure(-open);
-    }
-    if (const int error = awaitReady(bus.get(), deadline); error != 0) {
-        return failure(error);
-    }
-    sd_bus_message* made = nullptr;
-    const int make =
-        functions->newMethodCall(bus.get(), &made, service, "/org/freedesktop/network1",
-                                 "org.freedesktop.network1.Manager", "Describe");
-    const BusMessage request{made};
-    if (make < 0) {
-        return failure(-make);
-    }
-    if (const int set = functions->setAutoStart(request.get(), 0); set < 0) {
-        return failure(-set);
-    }
-    BusError error;
-    sd_bus_message* responded = nullptr;
-    // A timeout of 0 would mean the library's own of 25 seconds.
-    const int call =
-        functions->call(bus.get(), request.get(), std::max<std::uint64_t>(left(deadline), 1),
-                        error.get(), &responded);
-    const BusMessage response{responded};
-    if (call < 0) {
-        const bool absent = error.is(SD_BUS_ERROR_SERVICE_UNKNOWN) ||
-                            error.is(SD_BUS_ERROR_NAME_HAS_NO_OWNER) ||
-                            error.is(SD_BUS_ERROR_UNKNOWN_METHOD);  // before version 250
-        return absent ? NetworkdResponse{} : failure(-call);
-    }
-    const char* text = nullptr;
-    if (const int read = functions->readBasic(response.get(), SD_BUS_TYPE_STRING, &text);
-        read < 0) {
-        return failure(-read);
-    }
-    return {.json = text, .reason = {}};
+BusResponse askNetworkd(BusRequests::Deadline deadline) {
+    BusRequests requests{"systemd-networkd", "org.freedesktop.network1", deadline};
+    // Before version 250 there is no such method.
+    const auto description = requests.call({.path = "/org/freedesktop/network1",
+                                            .interface = "org.freedesktop.network1.Manager",
+                                            .name = "Describe"});
+    return {.json = description ? textOf(*description) : std::string{},
+            .reason = requests.failure()};
 }
 
-void addNetworkdDescription(const std::vector<NetworkdAddress>& addresses, ClientFacts& facts) {
-    for (const NetworkdAddress& address : addresses) {
-        const auto isOfThatLink = [&](const auto& fact) {
-            return fact.client == Client::Networkd && fact.ifindex == address.ifindex;
-        };
+std::int64_t startOfSystem() {
+    const auto read = [](clockid_t clock) {
+        timespec time{};
+        // Cannot fail: both clocks are there on every kernel since 2.6.39.
+        static_cast<void>(::clock_gettime(clock, &time));
+        return std::int64_t{time.tv_sec} * second + time.tv_nsec / 1'000;
+    };
+    return read(CLOCK_REALTIME) - read(CLOCK_BOOTTIME);
+}
+
+void addNetworkdDescription(const NetworkdDescription& description, std::int64_t start,
+                            ClientFacts& facts) {
+    const auto managementOf = [&](std::uint32_t ifindex) {
+        const auto found = std::find_if(
+            facts.managements.begin(), facts.managements.end(), [&](const LinkConfiguration& each) {
+                return each.client == Client::Networkd && each.ifindex == ifindex;
+            });
+        return found == facts.managements.end() ? nullptr : &*found;
+    };
+    // A client is there while the link is under DHCP, whatever its file says by now. That of
+    // DHCPv6 may ask for other things than an address.
+    for (const NetworkdClient& client : description.clients) {
+        if (auto* const management = client.ipv6 ? nullptr : managementOf(client.ifindex)) {
+            management->dhcp4 = true;
+        }
+    }
+    for (const NetworkdAddress& address : description.addresses) {
+        auto* const management = managementOf(address.ifindex);
         if (address.source == "DHCPv4" || address.source == "DHCPv6") {
-            const bool known =
-                std::any_of(facts.leases.begin(), facts.leases.end(), [&](const Lease& lease) {
-                    return isOfThatLink(lease) && lease.address == address.address;
-                });
-            if (!known) {
-                facts.leases.push_back({.client = Client::Networkd,
-                                        .interfaceName = {},
-                                        .ifindex = address.ifindex,
-                                        .address = address.address,
-                                        .server = address.provider,
-                                        .clientAlive = true,
-                                        .expires = {},
-                                        .origin = std::string{origin}});
+            addLease(address, description, start, facts);
+            if (management != nullptr) {
+                (address.address.isIPv4() ? management->dhcp4 : management->dhcp6) = true;
             }
-        } else if (address.source == "static" && address.address.isIPv4()) {
-            const auto management =
-                std::find_if(facts.managements.begin(), facts.managements.end(), isOfThatLink);
-            if (management != facts.managements.end()) {
-                auto& told = management->staticAddresses;
-                if (std::find(told.begin(), told.end(), address.address) == told.end()) {
-                    told.push_back(address.address);
-                }
+        } else if (address.source == "static" && address.address.isIPv4() &&
+                   management != nullptr) {
+            auto& told = management->staticAddresses;
+            if (std::find(told.begin(), told.end(), address.address) == told.end()) {
+                told.push_back(address.address);
             }
         }
     }

@@ -1,12 +1,12 @@
 #pragma once
 
-#include <chrono>
 #include <cstdint>
 #include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
 
+#include "clients/BusRequest.h"
 #include "facts/ClientFacts.h"
 #include "formats/IpAddress.h"
 #include "formats/Parsed.h"
@@ -19,31 +19,47 @@ struct NetworkdAddress {
     IpAddress address;
     std::string source;                 ///< "DHCPv4", "DHCPv6", "static", "IPv4LL", "foreign", ...
     std::optional<IpAddress> provider;  ///< the server that gave it
+    /// Its end, in microseconds since the start of the system (CLOCK_BOOTTIME); nullopt
+    /// where it has none.
+    std::optional<std::uint64_t> validUntil{};
 
     bool operator==(const NetworkdAddress&) const = default;
 };
 
-/// Parses networkd's description of itself, or of one link. Any text gives facts or a
-/// reason; what is not an address is skipped.
-[[nodiscard]] Parsed<std::vector<NetworkdAddress>> parseNetworkdDescription(std::string_view json);
+/// What versions since 257 say of a client of one link. Times are as in an address, and
+/// nullopt without a lease.
+struct NetworkdClient {
+    std::uint32_t ifindex = 0;
+    bool ipv6 = false;
+    std::optional<std::uint64_t> obtained{};
+    std::optional<std::uint64_t> renews{};
+    std::optional<std::uint64_t> rebinds{};
+    std::string identifier{};  ///< its DUID, or of IPv4 its client identifier, in hexadecimal
 
-/// A description as text, or the reason why there is none; both empty where there is
-/// no bus or no networkd.
-struct NetworkdResponse {
-    std::string json;
-    std::string reason;
-
-    bool operator==(const NetworkdResponse&) const = default;
+    bool operator==(const NetworkdClient&) const = default;
 };
 
-/// Asks the networkd of this machine over the system bus. Starts nothing, and returns
-/// at the deadline at the latest, whatever the bus and networkd do. Never throws apart
-/// from std::bad_alloc.
-[[nodiscard]] NetworkdResponse askNetworkd(std::chrono::steady_clock::time_point deadline);
+struct NetworkdDescription {
+    std::vector<NetworkdAddress> addresses;
+    std::vector<NetworkdClient> clients;
+
+    bool operator==(const NetworkdDescription&) const = default;
+};
+
+/// Parses networkd's description of itself, or of one link. Any text gives facts or a
+/// reason; what is not an address is skipped.
+[[nodiscard]] Parsed<NetworkdDescription> parseNetworkdDescription(std::string_view json);
+
+/// Asks the networkd of this machine over the system bus.
+[[nodiscard]] BusResponse askNetworkd(BusRequests::Deadline deadline);
+
+/// When the system started, in microseconds since the epoch.
+[[nodiscard]] std::int64_t startOfSystem();
 
 /// Adds to the facts what the state files do not tell: the servers of DHCPv6 leases,
-/// which networkd alone of all clients knows by address, and the addresses that it was
-/// told. Of a lease that is there already nothing is added.
-void addNetworkdDescription(const std::vector<NetworkdAddress>& addresses, ClientFacts& facts);
+/// which networkd alone of all clients knows by address, the ends of leases, and the
+/// addresses that it was told. `start`: of the system, as startOfSystem() tells it.
+void addNetworkdDescription(const NetworkdDescription& description, std::int64_t start,
+                            ClientFacts& facts);
 
 }  // namespace ZR::Live

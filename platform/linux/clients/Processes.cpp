@@ -371,10 +371,13 @@ class Reader {
     /// Whether a process of dhcpcd gave up its rights, and has another one of root for what
     /// needs them. No other user can have such a one.
     [[nodiscard]] bool hasPartOfRoot(const Candidate& candidate) const {
+        const std::int32_t parent = candidate.status.parent;
+        const bool isPart = std::any_of(parts_.begin(), parts_.end(),
+                                        [&](const Part& part) { return part.pid == parent; });
         return candidate.process.client == Client::Dhcpcd &&
                std::any_of(parts_.begin(), parts_.end(), [&](const Part& part) {
                    return part.ofRoot && (part.parent == candidate.process.pid ||
-                                          part.pid == candidate.status.parent);
+                                          part.pid == parent || (isPart && part.parent == parent));
                });
     }
 

@@ -42,6 +42,10 @@ SdBus::SdBus(const char* library) : handle_(::dlopen(library, RTLD_NOW | RTLD_LO
     find(call, "sd_bus_call");
     find(newMethodCall, "sd_bus_message_new_method_call");
     find(setAutoStart, "sd_bus_message_set_auto_start");
+    find(appendBasic, "sd_bus_message_append_basic");
+    find(peekType, "sd_bus_message_peek_type");
+    find(enterContainer, "sd_bus_message_enter_container");
+    find(exitContainer, "sd_bus_message_exit_container");
     find(readBasic, "sd_bus_message_read_basic");
     find(messageUnref, "sd_bus_message_unref");
     find(errorHasName, "sd_bus_error_has_name");

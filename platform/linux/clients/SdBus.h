@@ -10,7 +10,7 @@ namespace ZR::Live {
 /// The functions of libsystemd that a request over the system bus needs. The library is
 /// loaded with the first request, not with this code: with the libraries that it needs
 /// (compression, ciphers) it would double what the provider costs a process, and most
-/// machines have no networkd to be asked.
+/// machines have no manager to be asked.
 class SdBus {
   public:
     /// Those of this process, kept until this code itself is unloaded. While they cannot
@@ -31,6 +31,10 @@ class SdBus {
     decltype(&::sd_bus_call) call = nullptr;
     decltype(&::sd_bus_message_new_method_call) newMethodCall = nullptr;
     decltype(&::sd_bus_message_set_auto_start) setAutoStart = nullptr;
+    decltype(&::sd_bus_message_append_basic) appendBasic = nullptr;
+    decltype(&::sd_bus_message_peek_type) peekType = nullptr;
+    decltype(&::sd_bus_message_enter_container) enterContainer = nullptr;
+    decltype(&::sd_bus_message_exit_container) exitContainer = nullptr;
     decltype(&::sd_bus_message_read_basic) readBasic = nullptr;
     decltype(&::sd_bus_message_unref) messageUnref = nullptr;
     decltype(&::sd_bus_error_has_name) errorHasName = nullptr;

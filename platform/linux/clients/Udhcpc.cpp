@@ -1,17 +1,19 @@
 #include "clients/Udhcpc.h"
 
 #include <sys/stat.h>
+#include <sys/types.h>
 
 #include <algorithm>
 #include <array>
 #include <cstdint>
 #include <string>
-#include <utility>
+#include <vector>
 
 #include "formats/Files.h"
 #include "formats/Numbers.h"
 #include "formats/OptionWalk.h"
 #include "formats/ShellAssignments.h"
+#include "formats/Trust.h"
 
 namespace ZR::Live {
 namespace {
@@ -28,11 +30,100 @@ constexpr std::array<std::string_view, 12> longWithValue{
     "interface", "client-port",    "script",  "pidfile", "retries",     "timeout",
     "tryagain",  "request-option", "request", "fqdn",    "vendorclass", "hostname"};
 
-bool runsOn(const ClientFacts& facts, const InterfaceName& interface) {
-    return std::any_of(
+/// Under which names a script is given the options that came. Those that it is not told of
+/// by name are "opt" and their number.
+struct NamedOption {
+    std::string_view name;
+    std::uint16_t code;
+};
+constexpr std::array<NamedOption, 39> namedOptions{{
+    {"subnet", 1},         {"timezone", 2},         {"router", 3},
+    {"timesrv", 4},        {"namesrv", 5},          {"dns", 6},
+    {"logsrv", 7},         {"cookiesrv", 8},        {"lprsrv", 9},
+    {"hostname", 12},      {"bootsize", 13},        {"domain", 15},
+    {"swapsrv", 16},       {"rootpath", 17},        {"ipttl", 23},
+    {"mtu", 26},           {"broadcast", 28},       {"routes", 33},
+    {"nisdomain", 40},     {"nissrv", 41},          {"ntpsrv", 42},
+    {"wins", 44},          {"requestip", 50},       {"lease", 51},
+    {"dhcptype", 53},      {"serverid", 54},        {"message", 56},
+    {"tftp", 66},          {"bootfile", 67},        {"tzstr", 100},
+    {"tzdbstr", 101},      {"search", 119},         {"sipsrv", 120},
+    {"staticroutes", 121}, {"vlanid", 132},         {"vlanpriority", 133},
+    {"ip6rd", 212},        {"msstaticroutes", 249}, {"wpad", 252},
+}};
+
+std::optional<std::uint16_t> codeOf(std::string_view name) {
+    constexpr std::string_view numbered = "opt";
+    if (name.starts_with(numbered)) {
+        return parseNumber<std::uint8_t>(name.substr(numbered.size()));
+    }
+    const auto* const found =
+        std::find_if(namedOptions.begin(), namedOptions.end(),
+                     [&](const NamedOption& known) { return known.name == name; });
+    return found == namedOptions.end() ? std::nullopt : std::optional{found->code};
+}
+
+std::vector<std::uint16_t> codesOf(std::string_view names) {
+    std::vector<std::uint16_t> codes;
+    constexpr std::string_view blanks = " \t\n";
+    while (!names.empty()) {
+        names.remove_prefix(std::min(names.find_first_not_of(blanks), names.size()));
+        const std::string_view name = names.substr(0, names.find_first_of(blanks));
+        names.remove_prefix(name.size());
+        const auto code = codeOf(name);
+        if (code && std::find(codes.begin(), codes.end(), *code) == codes.end()) {
+            codes.push_back(*code);
+        }
+    }
+    return codes;
+}
+
+/// The client whose script writes the file of an interface; nullptr when it does not run.
+const ClientProcess* clientOf(const ClientFacts& facts, const InterfaceName& interface) {
+    const auto found = std::find_if(
         facts.processes.begin(), facts.processes.end(), [&](const ClientProcess& process) {
             return process.client == Client::Udhcpc && !process.ipv6 && process.serves(interface);
         });
+    return found == facts.processes.end() ? nullptr : &*found;
+}
+
+void readState(const std::string& path, const InterfaceName& interface, ClientFacts& facts) {
+    const ClientProcess* const client = clientOf(facts, interface);
+    std::vector<uid_t> writers;
+    if (client != nullptr) {
+        writers.push_back(client->user);
+    }
+    struct stat status {};
+    if (!isTrusted(path, writers, facts.diagnostics) || ::stat(path.c_str(), &status) != 0) {
+        return;
+    }
+    const auto text = readOptionalFile(path, facts.diagnostics);
+    if (!text || text->empty()) {
+        return;  // an empty file is about to be written
+    }
+    const auto variables = parseShellAssignments(*text);
+    const auto lifetime = parseNumber<std::uint32_t>(lastValue(variables, "lease"));
+    const auto address = IpAddress::ipv4FromText(lastValue(variables, "ip"));
+    if (!address || !lifetime) {
+        facts.diagnostics.emplace_back(path + (address ? ": \"lease\" is not a number of seconds"
+                                                       : ": \"ip\" is not an IPv4 address"),
+                                       Diagnostic::Kind::Damaged);
+        return;
+    }
+    // Files of older scripts do not tell the time: they are as old as the lease.
+    const std::int64_t obtained =
+        parseNumber<std::int64_t>(lastValue(variables, "obtained")).value_or(status.st_mtim.tv_sec);
+    const bool endless = *lifetime == UINT32_MAX || obtained > Lease::never - UINT32_MAX;
+    facts.leases.push_back({.client = Client::Udhcpc,
+                            .interfaceName = interface,
+                            .address = *address,
+                            .server = IpAddress::ipv4FromText(lastValue(variables, "serverid")),
+                            .clientAlive = client != nullptr,
+                            .expires = endless ? Lease::never : obtained + *lifetime,
+                            .obtained = obtained,
+                            .options = codesOf(lastValue(variables, "options")),
+                            .pid = client == nullptr ? 0 : client->pid,
+                            .origin = path});
 }
 
 }  // namespace
@@ -74,28 +165,9 @@ void readUdhcpc(const Roots& roots, ClientFacts& facts) {
         }
         stem.remove_prefix(udhcpcStatePrefix.size());
         stem.remove_suffix(stateSuffix.size());
-        const auto interface = InterfaceName::from(stem);
-        std::string path = pathIn(directory, name);
-        struct stat status {};
-        if (!interface || ::stat(path.c_str(), &status) != 0) {
-            continue;
+        if (const auto interface = InterfaceName::from(stem)) {
+            readState(pathIn(directory, name), *interface, facts);
         }
-        const auto text = readOptionalFile(path, facts.diagnostics);
-        const auto variables = parseShellAssignments(text.value_or(""));
-        const auto lifetime = parseNumber<std::uint32_t>(lastValue(variables, "lease"));
-        const auto address = IpAddress::ipv4FromText(lastValue(variables, "ip"));
-        if (!address || !lifetime) {
-            continue;
-        }
-        facts.leases.push_back({.client = Client::Udhcpc,
-                                .interfaceName = interface,
-                                .address = *address,
-                                .server = IpAddress::ipv4FromText(lastValue(variables, "serverid")),
-                                .clientAlive = runsOn(facts, *interface),
-                                .expires = *lifetime == UINT32_MAX
-                                               ? Lease::never
-                                               : status.st_mtim.tv_sec + std::int64_t{*lifetime},
-                                .origin = std::move(path)});
     }
 }
 

@@ -10,7 +10,9 @@
 namespace ZR::Live {
 
 /// udhcpc itself keeps its lease to itself. An event script can leave it here, as
-/// udhcpc.INTERFACE.state with the variables that it was given: ip, serverid, lease.
+/// udhcpc.INTERFACE.state with the variables that it was given: ip, serverid, lease; when
+/// that was, as obtained (seconds since the epoch); and the names of those that stand for
+/// options, as options. docs/sources.md has the script.
 inline constexpr std::string_view udhcpcStateDirectory = "/run";
 inline constexpr std::string_view udhcpcStatePrefix = "udhcpc.";
 

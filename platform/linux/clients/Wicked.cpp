@@ -7,6 +7,7 @@
 #include <utility>
 #include <variant>
 
+#include "clients/Managers.h"
 #include "formats/Files.h"
 #include "formats/InterfaceName.h"
 #include "formats/Numbers.h"
@@ -87,6 +88,8 @@ class Builder {
             }
             if (lease_.family == AF_INET) {
                 address.lifetime = leaseTime_;
+                address.renewal = renewal_;
+                address.rebinding = rebinding_;
             }
         }
         return std::move(lease_);
@@ -117,6 +120,12 @@ class Builder {
             lease_.server = IpAddress::fromText(AF_INET6, address);
         } else if (name == "lease-time") {
             leaseTime_ = parseNumber<std::uint32_t>(text);
+        } else if (name == "renewal-time") {
+            renewal_ = parseNumber<std::uint32_t>(text);
+        } else if (name == "rebind-time") {
+            rebinding_ = parseNumber<std::uint32_t>(text);
+        } else if (name == "client-id") {
+            lease_.clientIdentifier = text;
         } else if (name == "address" && lease_.family == AF_INET) {
             if (const auto address = IpAddress::ipv4FromText(text)) {
                 lease_.addresses = {{.address = *address, .acquired = {}, .lifetime = {}}};
@@ -127,11 +136,18 @@ class Builder {
     void takeAssociated(std::string_view name, std::string_view text) {
         if (name == "acquired") {
             associationAcquired_ = parseNumber<std::int64_t>(text);
+        } else if (name == "renewal-time") {
+            associationRenewal_ = parseNumber<std::uint32_t>(text);
+        } else if (name == "rebind-time") {
+            associationRebinding_ = parseNumber<std::uint32_t>(text);
         } else if (name == "address") {
             const std::string_view plain = text.substr(0, text.find('/'));
             if (const auto address = IpAddress::fromText(AF_INET6, plain)) {
-                lease_.addresses.push_back(
-                    {.address = *address, .acquired = associationAcquired_, .lifetime = {}});
+                lease_.addresses.push_back({.address = *address,
+                                            .acquired = associationAcquired_,
+                                            .lifetime = {},
+                                            .renewal = associationRenewal_,
+                                            .rebinding = associationRebinding_});
             }
         } else if (name.starts_with("valid-") && !lease_.addresses.empty()) {
             lease_.addresses.back().lifetime = parseNumber<std::uint32_t>(text);
@@ -141,7 +157,11 @@ class Builder {
     WickedLease lease_;
     std::optional<std::int64_t> acquired_;
     std::optional<std::int64_t> associationAcquired_;
+    std::optional<std::uint32_t> associationRenewal_;
+    std::optional<std::uint32_t> associationRebinding_;
     std::optional<std::uint32_t> leaseTime_;
+    std::optional<std::uint32_t> renewal_;
+    std::optional<std::uint32_t> rebinding_;
 };
 
 /// lease-INTERFACE-dhcp-ipv4.xml, or -ipv6.xml.
@@ -157,15 +177,17 @@ std::optional<InterfaceName> interfaceOf(std::string_view name) {
     return InterfaceName::from(name);
 }
 
-std::optional<std::int64_t> end(const WickedAddress& address) {
-    if (address.lifetime == UINT32_MAX) {
+/// A time that lies some seconds behind the one at which an address was acquired.
+std::optional<std::int64_t> after(const WickedAddress& address,
+                                  const std::optional<std::uint32_t>& seconds) {
+    if (seconds == UINT32_MAX) {
         return Lease::never;
     }
-    if (!address.acquired || !address.lifetime || *address.acquired < 0 ||
+    if (!address.acquired || !seconds || *address.acquired < 0 ||
         *address.acquired > Lease::never - UINT32_MAX) {
         return std::nullopt;
     }
-    return *address.acquired + *address.lifetime;
+    return *address.acquired + *seconds;
 }
 
 void addLeases(const WickedLease& lease, const InterfaceName& interface, const std::string& path,
@@ -174,7 +196,7 @@ void addLeases(const WickedLease& lease, const InterfaceName& interface, const s
         return;
     }
     for (const WickedAddress& address : lease.addresses) {
-        const auto expires = end(address);
+        const auto expires = after(address, address.lifetime);
         if (expires && address.address.family() == lease.family) {
             facts.leases.push_back({.client = Client::Wicked,
                                     .interfaceName = interface,
@@ -182,6 +204,11 @@ void addLeases(const WickedLease& lease, const InterfaceName& interface, const s
                                     .server = lease.server,
                                     .clientAlive = facts.runs(Client::Wicked),
                                     .expires = expires,
+                                    .obtained = address.acquired,
+                                    .renews = after(address, address.renewal),
+                                    .rebinds = after(address, address.rebinding),
+                                    .clientIdentifier = lease.clientIdentifier,
+                                    .pid = pidOfManager(facts, Client::Wicked),
                                     .origin = path});
         }
     }
@@ -213,7 +240,8 @@ void readWicked(const Roots& roots, ClientFacts& facts) {
             }
             auto parsed = parseWickedLease(*text);
             if (const auto* const reason = std::get_if<std::string_view>(&parsed)) {
-                facts.diagnostics.emplace_back("cannot use " + path + ": " + std::string{*reason});
+                facts.diagnostics.emplace_back("cannot use " + path + ": " + std::string{*reason},
+                                               Diagnostic::Kind::Damaged);
             } else {
                 addLeases(std::get<WickedLease>(parsed), *interface, path, facts);
             }

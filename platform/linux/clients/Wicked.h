@@ -22,8 +22,10 @@ inline constexpr std::string_view wickedLeasePrefix = "lease-";
 /// One address of a wicked lease.
 struct WickedAddress {
     IpAddress address;
-    std::optional<std::int64_t> acquired;   ///< epoch seconds
-    std::optional<std::uint32_t> lifetime;  ///< seconds; UINT32_MAX: for ever
+    std::optional<std::int64_t> acquired;      ///< epoch seconds
+    std::optional<std::uint32_t> lifetime;     ///< seconds; UINT32_MAX: for ever
+    std::optional<std::uint32_t> renewal{};    ///< T1, likewise
+    std::optional<std::uint32_t> rebinding{};  ///< T2, likewise
 
     bool operator==(const WickedAddress&) const = default;
 };
@@ -35,6 +37,7 @@ struct WickedLease {
     std::string state;                ///< "granted" while it holds
     std::optional<IpAddress> server;  ///< of DHCPv6 the sender of the messages
     std::vector<WickedAddress> addresses;
+    std::string clientIdentifier{};  ///< as it stands there; of DHCPv6 the DUID
 
     bool operator==(const WickedLease&) const = default;
 };

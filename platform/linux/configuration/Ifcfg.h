@@ -8,13 +8,14 @@
 #include "facts/ClientFacts.h"
 #include "formats/IpAddress.h"
 #include "formats/Roots.h"
+#include "zrcommon/InterfaceFile.h"
 
 namespace ZR::Live {
 
 /// Where ifcfg-NAME files lie: with network-scripts or NetworkManager, and with wicked.
 inline constexpr std::array<std::string_view, 2> ifcfgDirectories{"/etc/sysconfig/network-scripts",
                                                                   "/etc/sysconfig/network"};
-inline constexpr std::string_view ifcfgPrefix = "ifcfg-";
+inline constexpr std::string_view ifcfgPrefix = InterfaceFile::prefix;
 
 /// The settings of an ifcfg file that tell where addresses come from.
 struct IfcfgFile {

@@ -8,6 +8,7 @@
 #include <map>
 
 #include "formats/Files.h"
+#include "formats/Trust.h"
 #include "zrcommon/Strings.h"
 
 namespace ZR::Live {
@@ -195,30 +196,33 @@ std::vector<std::pair<InterfaceName, std::string>> parseIfstate(std::string_view
 void readIfupdown(const Roots& roots, ClientFacts& facts) {
     Reader reader{roots, facts};
     reader.readFile(std::string{ifupdownDirectory} + '/' + std::string{ifupdownFile}, 0);
-    const auto state = readOptionalFile(
-        pathIn(roots.path(ifupdownStateDirectory), ifupdownStateFile), facts.diagnostics);
+    const auto state = readTrustedFile(
+        pathIn(roots.path(ifupdownStateDirectory), ifupdownStateFile), {}, facts.diagnostics);
     const auto up = parseIfstate(state.value_or(""));
     std::map<InterfaceName, LinkConfiguration> byInterface;
-    const auto applyTo = [&](const InterfaceName& interface, const Found& found) {
+    const auto applyTo = [&](const InterfaceName& interface,
+                             const Found& found) -> LinkConfiguration& {
         const LinkConfiguration empty{.client = Client::Ifupdown,
                                       .interfaceName = interface,
                                       .dhcp4 = {},
                                       .dhcp6 = {},
                                       .staticAddresses = {},
                                       .origin = found.file};
-        apply(found.stanza, byInterface.emplace(interface, empty).first->second);
+        LinkConfiguration& configuration = byInterface.emplace(interface, empty).first->second;
+        apply(found.stanza, configuration);
+        return configuration;
     };
     for (const Found& found : reader.found()) {
         bool mapped = false;
         for (const auto& [physical, logical] : up) {
             if (logical == found.stanza.name) {
                 mapped = true;
-                applyTo(physical, found);
+                applyTo(physical, found).applied = true;
             }
         }
         const auto name = InterfaceName::from(found.stanza.name);
         if (!mapped && name) {
-            applyTo(*name, found);
+            static_cast<void>(applyTo(*name, found));
         }
     }
     for (auto& [interface, configuration] : byInterface) {

@@ -42,7 +42,8 @@ struct InterfacesFile {
 [[nodiscard]] std::vector<std::pair<InterfaceName, std::string>> parseIfstate(
     std::string_view text);
 
-/// Adds the configuration of each interface.
+/// Adds the configuration of each interface; it is applied where the interface is up. What
+/// ifup(8) has started since may have ended: that it is applied does not say that it is so.
 void readIfupdown(const Roots& roots, ClientFacts& facts);
 
 }  // namespace ZR::Live

@@ -23,6 +23,7 @@ struct LinkConfiguration {
     bool linkLocal4 = false;                 ///< takes an address of 169.254/16 (RFC 3927)
     bool bootp4 = false;                     ///< asks by BOOTP (RFC 951), without DHCP
     bool other4 = false;                     ///< by another protocol, or shares the link
+    bool applied = false;                    ///< it was brought up so, and not down since
     std::string origin{};                    ///< the file that says so
 
     bool operator==(const LinkConfiguration&) const = default;

@@ -8,6 +8,8 @@
 #include <tuple>
 #include <utility>
 
+#include "formats/Hexadecimal.h"
+
 namespace ZR::Live {
 namespace {
 
@@ -66,20 +68,6 @@ std::uint32_t number(Bytes bytes) {
         value = value << 8U | std::to_integer<std::uint32_t>(byte);
     }
     return value;
-}
-
-/// Bytes in hexadecimal, as in "01:52:54".
-std::string hexadecimal(Bytes bytes) {
-    constexpr std::string_view digits = "0123456789abcdef";
-    std::string text;
-    for (const std::byte byte : bytes) {
-        if (!text.empty()) {
-            text += ':';
-        }
-        text += digits[std::to_integer<unsigned>(byte) >> 4U];
-        text += digits[std::to_integer<unsigned>(byte) & 0xFU];
-    }
-    return text;
 }
 
 void addOnce(unsigned code, std::vector<std::uint16_t>& codes) {

@@ -2,7 +2,9 @@
 
 #include <cstdint>
 #include <optional>
+#include <string>
 #include <string_view>
+#include <vector>
 
 #include "formats/IpAddress.h"
 
@@ -14,12 +16,15 @@ struct NetworkdLease {
     std::optional<IpAddress> address;
     std::optional<IpAddress> server;
     std::optional<std::uint64_t> lifetime;  ///< seconds; infiniteTime: for ever
+    std::vector<std::uint16_t> options{};   ///< codes that the server must have sent
+    std::string clientIdentifier{};         ///< as it stands there
+    std::string damage{};                   ///< the first line that is wrong, and why; empty: none
 
     bool operator==(const NetworkdLease&) const = default;
 };
 
-/// Any text gives facts: lines that are not understood are skipped. The form changed
-/// between the versions 252 and 257, in the times only.
+/// Any text gives facts: lines that are not of the form are skipped, and the first is told. The
+/// form changed between the versions 252 and 257, in the times only.
 [[nodiscard]] NetworkdLease parseNetworkdLease(std::string_view text);
 
 }  // namespace ZR::Live

@@ -14,8 +14,6 @@ namespace ZR {
 
 namespace {
 
-constexpr const char* defaultFile = "/etc/zr/platform.conf";
-
 /// Takes a text into a setting; returns what is wrong with it, or null. The
 /// setting has its default when something is: a value that cannot be used must not
 /// leave an earlier one in force.

@@ -5,6 +5,7 @@
 #include <filesystem>
 
 #include "kit/FileContent.h"
+#include "kit/Refusal.h"
 #include "kit/TemporaryDirectory.h"
 #include "text/Failure.h"
 
@@ -17,13 +18,7 @@ using ZR::Testing::writeFile;
 
 template <typename Find>
 std::string refusal(Find&& find) {
-    try {
-        static_cast<void>(std::forward<Find>(find)());
-        return "found";
-    } catch (const Failure& failure) {
-        EXPECT_EQ(failure.status(), ExitStatus::notLoaded);
-        return failure.what();
-    }
+    return test::refusalOf(std::forward<Find>(find), ExitStatus::notLoaded);
 }
 
 class DirectoriesFound : public ::testing::Test {

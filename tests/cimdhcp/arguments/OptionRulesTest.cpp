@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include "arguments/CommandLine.h"
+#include "kit/Refusal.h"
 #include "text/Failure.h"
 
 namespace cimdhcp {
@@ -13,13 +14,7 @@ CommandLine line(const std::vector<std::string>& arguments) {
 }
 
 std::string refusal(const std::vector<std::string>& arguments) {
-    try {
-        static_cast<void>(readCommandLine(arguments));
-        return "accepted";
-    } catch (const Failure& failure) {
-        EXPECT_EQ(failure.status(), ExitStatus::usage);
-        return failure.what();
-    }
+    return test::refusalOf([&arguments] { return readCommandLine(arguments); }, ExitStatus::usage);
 }
 
 TEST(OptionRules, NamesServers) {

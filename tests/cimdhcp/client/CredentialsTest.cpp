@@ -7,6 +7,7 @@
 
 #include "kit/ChildProcess.h"
 #include "kit/FileContent.h"
+#include "kit/Refusal.h"
 #include "kit/TemporaryDirectory.h"
 #include "text/Failure.h"
 
@@ -22,13 +23,7 @@ std::vector<Credential> parsed(const std::string& text) {
 }
 
 std::string refusal(const std::string& text) {
-    try {
-        static_cast<void>(parsed(text));
-        return "accepted";
-    } catch (const Failure& failure) {
-        EXPECT_EQ(failure.status(), ExitStatus::notLoaded);
-        return failure.what();
-    }
+    return test::refusalOf([&text] { return parsed(text); }, ExitStatus::notLoaded);
 }
 
 TEST(Credentials, AreWordsLikeThoseOfNetrc) {

@@ -124,6 +124,13 @@ TEST(InterfaceState, OfAClientThatKeepsNoFileTheAddressTells) {
     EXPECT_EQ(with(AddressSource::Unknown), "?");
     one.addressSource = std::nullopt;
     EXPECT_EQ(wordFor(one), "?");
+    // The node may have that address, too.
+    one.leases->front().address = "192.0.2.17";
+    EXPECT_EQ(wordFor(one), "?");
+    EXPECT_EQ(with(AddressSource::DHCP), "bound");
+    EXPECT_EQ(with(AddressSource::Static), "?");
+    one.leases->front().address = "192.0.2.18";
+    EXPECT_EQ(with(AddressSource::DHCP), "?");
     // An IPv4 address says nothing about a client for IPv6.
     one.leases = {client("IPv6")};
     EXPECT_EQ(wordFor(one), "asking");

@@ -180,17 +180,20 @@ TEST_F(LeasesOfATree, HaveNoTimesBeyondTheLast) {
 TEST_F(LeasesOfATree, KnowThatTheirClientIsGone) {
     using ZR::Diagnostic;
     addLease();
-    builder_.diagnostic(Diagnostic("eth1: dhclient does not run", Diagnostic::Kind::ClientGone));
-    EXPECT_TRUE(leases()[0].clientGone);
-}
-
-TEST_F(LeasesOfATree, WhoseClientRunsAreNotThoseOfOneThatIsGone) {
-    using ZR::Diagnostic;
+    builder_.property(Properties::Address, std::string("192.0.2.1"));
     addLease();
-    builder_.property(Properties::Process, std::uint64_t{17});
-    builder_.diagnostic(Diagnostic("eth1: dhclient does not run", Diagnostic::Kind::ClientGone));
-    builder_.diagnostic(Diagnostic("eth1: something else", Diagnostic::Kind::Note));
-    EXPECT_FALSE(leases()[0].clientGone);
+    builder_.property(Properties::Address, std::string("192.0.2.17"));
+    addLease();
+    builder_.diagnostic(
+        Diagnostic("eth1: the client that leased 192.0.2.17 (dhclient) does not run",
+                   Diagnostic::Kind::ClientGone));
+    builder_.diagnostic(Diagnostic("eth0: the client that leased 192.0.2.1 (dhclient) does not run",
+                                   Diagnostic::Kind::ClientGone));
+    builder_.diagnostic(Diagnostic("eth1: 192.0.2.1 is noteworthy", Diagnostic::Kind::Note));
+    const auto found = leases();
+    EXPECT_FALSE(found[0].clientGone);
+    EXPECT_TRUE(found[1].clientGone);
+    EXPECT_FALSE(found[2].clientGone);
 }
 
 class MachineInterfacesServed : public ::testing::Test {

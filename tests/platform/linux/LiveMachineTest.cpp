@@ -96,7 +96,7 @@ class LiveMachineTest : public testing::Test {
         surroundings.transport = std::make_unique<ScriptedTransport>(std::move(responses));
         surroundings.realProcesses = false;
         surroundings.uptime = [this] { return uptime_; };
-        surroundings.askNetworkd = [this](auto /*deadline*/) {
+        surroundings.buses.networkd = [this](auto /*deadline*/) {
             ++asked_;
             return networkd_;
         };
@@ -106,16 +106,25 @@ class LiveMachineTest : public testing::Test {
         return *machine_;
     }
 
+    /// Makes networkd one of the machine's processes.
+    void runNetworkd() const {
+        root_.write("/proc/7/comm", "systemd-network\n");
+        root_.write("/proc/7/status",
+                    "Name:\tsystemd-network\nState:\tS (sleeping)\nPPid:\t1\n"
+                    "Uid:\t0\t0\t0\t0\nCapEff:\t000001ffffffffff\n");
+    }
+
     TemporaryDirectory root_;
     std::int64_t now_ = 1'795'216'200;
     std::chrono::steady_clock::time_point uptime_{std::chrono::hours{1000}};
-    NetworkdResponse networkd_;
+    BusResponse networkd_;
     int asked_ = 0;
     std::vector<std::string> diagnostics_;
     std::unique_ptr<LiveMachine> machine_;
 };
 
 TEST_F(LiveMachineTest, CapturedNetworkdLeaseOnItsLink) {
+    runNetworkd();
     root_.write("/run/systemd/netif/links/2", sample("networkd/run-systemd-netif-links-2.txt"));
     root_.write("/run/systemd/netif/leases/2", sample("networkd/run-systemd-netif-leases-2.txt"));
     root_.write("/etc/systemd/network/10-eth1.network", sample("networkd/10-eth1.network"));
@@ -129,6 +138,7 @@ TEST_F(LiveMachineTest, CapturedNetworkdLeaseOnItsLink) {
 }
 
 TEST_F(LiveMachineTest, NetworkdItselfTellsOfTheServerOfADhcpv6Lease) {
+    runNetworkd();
     root_.write("/run/systemd/netif/links/2", sample("networkd/run-systemd-netif-links-2.txt"));
     networkd_.json = sample("networkd/networkctl-status-eth1.json");
     ifaddrmsg info{};
@@ -151,6 +161,7 @@ TEST_F(LiveMachineTest, NetworkdIsAskedOnlyWhereItHasLinks) {
 }
 
 TEST_F(LiveMachineTest, ANetworkdThatDoesNotRespondIsLeftAloneForAWhile) {
+    runNetworkd();
     root_.write("/run/systemd/netif/links/2", sample("networkd/run-systemd-netif-links-2.txt"));
     root_.write("/run/systemd/netif/leases/2", sample("networkd/run-systemd-netif-leases-2.txt"));
     networkd_.reason = "too busy";
@@ -485,6 +496,7 @@ TEST_F(LiveMachineTest, BeforeItIsReadItCountsAsChanged) {
 }
 
 TEST_F(LiveMachineTest, EveryPlaceThatItReadsIsWatched) {
+    runNetworkd();
     root_.write("/proc/17/comm", "dhclient\n");
     root_.write("/proc/17/status", "State:\tS\nUid:\t0\t0\t0\t0\n");
     root_.write("/proc/17/cmdline", std::string{"dhclient\0-lf\0/srv/own.leases\0eth1\0", 34});

@@ -99,7 +99,7 @@ TEST(ClassIdentifiers, NullNameIsUnknown) {
     EXPECT_EQ(idOf(static_cast<const char*>(nullptr)), 255);
 }
 
-using ClassIdentifiersOfPathsTest = Testing::TestBroker;
+using ClassIdentifiersOfPathsTest = Testing::ProviderUtilitiesTest;
 
 TEST_F(ClassIdentifiersOfPathsTest, AreThoseOfTheirClasses) {
     EXPECT_EQ(ProviderUtilities::getClassId(newPath("QVXZR_DHCPSettingData")), 85);

@@ -24,7 +24,7 @@ std::string describe(const CMPIObjectPath* path, const char* parent) {
            text(path->ft->getNameSpace(path, nullptr)) + " is a " + parent + "?";
 }
 
-class ClassRelationsTest : public Testing::TestBroker {
+class ClassRelationsTest : public Testing::ProviderUtilitiesTest {
   protected:
     void SetUp() override { requests().clear(); }
 

@@ -10,7 +10,7 @@ namespace ZR {
 
 namespace {
 
-class KeysTest : public Testing::TestBroker {
+class KeysTest : public Testing::ProviderUtilitiesTest {
   protected:
     void SetUp() override {
         path_ = ProviderUtilities::createObjectPath(broker, "TEST_Element", nameSpace);

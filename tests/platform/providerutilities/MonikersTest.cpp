@@ -34,7 +34,7 @@ std::string describe(const CMPIObjectPath* path) {
     return text;
 }
 
-class MonikersTest : public Testing::TestBroker {
+class MonikersTest : public Testing::ProviderUtilitiesTest {
   protected:
     void SetUp() override {
         path_ = ProviderUtilities::createObjectPath(broker, "TEST_Element", nameSpace);

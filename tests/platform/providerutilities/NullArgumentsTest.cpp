@@ -19,7 +19,7 @@ constexpr const char* noName = nullptr;
 
 using Utilities = ProviderUtilities;
 
-class NullArgumentsTest : public Testing::TestBroker {
+class NullArgumentsTest : public Testing::ProviderUtilitiesTest {
   protected:
     void SetUp() override {
         path_ = Utilities::createObjectPath(broker, "TEST_Element", nameSpace);

@@ -10,7 +10,7 @@ namespace ZR {
 
 namespace {
 
-using ObjectsTest = Testing::TestBroker;
+using ObjectsTest = Testing::ProviderUtilitiesTest;
 
 TEST_F(ObjectsTest, PathHasItsClassAndNamespaceAndNoKeys) {
     const CMPIObjectPath* path =

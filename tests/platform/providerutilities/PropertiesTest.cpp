@@ -13,7 +13,7 @@ namespace {
 using Numbers = std::vector<unsigned short>;
 using Texts = std::vector<std::string>;
 
-class PropertiesTest : public Testing::TestBroker {
+class PropertiesTest : public Testing::ProviderUtilitiesTest {
   protected:
     void SetUp() override {
         const CMPIObjectPath* path =

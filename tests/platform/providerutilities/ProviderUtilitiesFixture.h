@@ -12,7 +12,7 @@
 namespace ZR::Testing {
 
 /// The broker of the embedded object manager with a small schema, inside of a request.
-class TestBroker : public testing::Test {
+class ProviderUtilitiesTest : public testing::Test {
   protected:
     static constexpr const char* nameSpace = "root/test";
 

@@ -47,22 +47,22 @@ TEST_F(CMPIDHCPCapabilitiesTest, InstanceHasWhatIsKnownAndNothingElse) {
     readOnly["readOnly"] = {"Name"};
     auto bare = test::interface("eth2", {{"DHCPEnabled", true}});
     setTree({host({writable, readOnly, bare})});
-    const Host::Answer answer = host_.enumerate(pathOf(className));
-    ASSERT_THAT(answer.instances, SizeIs(3));
+    const Host::Response response = host_.enumerate(pathOf(className));
+    ASSERT_THAT(response.instances, SizeIs(3));
     const auto edit = [&](std::size_t i) {
-        const cimom::Value* value = answer.instances[i]->property("ElementNameEditSupported");
+        const cimom::Value* value = response.instances[i]->property("ElementNameEditSupported");
         return value != nullptr && std::get<bool>(*value->scalar());
     };
     EXPECT_TRUE(edit(0));
     EXPECT_FALSE(edit(1));
-    EXPECT_EQ(test::textOf(*answer.instances[0], "InstanceID"), "eth0");
-    EXPECT_EQ(test::textOf(*answer.instances[0], "ElementName"), "eth0");
-    EXPECT_EQ(test::numberOf(*answer.instances[0], "MaxElementNameLen"), 15U);
-    EXPECT_EQ(answer.instances[2]->property("MaxElementNameLen"), nullptr);
+    EXPECT_EQ(test::textOf(*response.instances[0], "InstanceID"), "eth0");
+    EXPECT_EQ(test::textOf(*response.instances[0], "ElementName"), "eth0");
+    EXPECT_EQ(test::numberOf(*response.instances[0], "MaxElementNameLen"), 15U);
+    EXPECT_EQ(response.instances[2]->property("MaxElementNameLen"), nullptr);
     for (const char* name : {"RequestedStatesSupported", "ElementNameMask", "StateAwareness"}) {
-        EXPECT_EQ(answer.instances[0]->property(name), nullptr) << name;
+        EXPECT_EQ(response.instances[0]->property(name), nullptr) << name;
     }
-    const cimom::Value* options = answer.instances[0]->property("OptionsSupported");
+    const cimom::Value* options = response.instances[0]->property("OptionsSupported");
     ASSERT_NE(options, nullptr);
     EXPECT_EQ(options->type, cimom::Type::uint16);
     ASSERT_NE(options->array(), nullptr);

@@ -42,16 +42,16 @@ std::vector<std::string> propertyNames(const cimom::Instance& instance) {
 
 TEST_F(CMPIDHCPProtocolEndpointTest, PathHasTheFourKeysInTheirOrder) {
     setTree({host({dhcpInterface("eth0")})});
-    const Host::Answer answer = host_.enumerateNames(pathOf(className));
-    ASSERT_THAT(answer.paths, SizeIs(1));
+    const Host::Response response = host_.enumerateNames(pathOf(className));
+    ASSERT_THAT(response.paths, SizeIs(1));
     cimom::ObjectPath expected =
         pathOf(className, {{"SystemCreationClassName", "QVXZR_ComputerSystem"},
                            {"SystemName", hostName()},
                            {"CreationClassName", className},
                            {"Name", "eth0"}});
-    EXPECT_EQ(*answer.paths[0], expected);
+    EXPECT_EQ(*response.paths[0], expected);
     std::vector<std::string> order;
-    for (const auto& key : answer.paths[0]->keys) {
+    for (const auto& key : response.paths[0]->keys) {
         order.push_back(key.name);
     }
     EXPECT_THAT(order,
@@ -60,9 +60,9 @@ TEST_F(CMPIDHCPProtocolEndpointTest, PathHasTheFourKeysInTheirOrder) {
 
 TEST_F(CMPIDHCPProtocolEndpointTest, InstanceHasJustThePropertiesThatAreKnown) {
     setTree({host({dhcpInterface("eth0")})});
-    const Host::Answer answer = host_.enumerate(pathOf(className));
-    ASSERT_THAT(answer.instances, SizeIs(1));
-    const cimom::Instance& instance = *answer.instances[0];
+    const Host::Response response = host_.enumerate(pathOf(className));
+    ASSERT_THAT(response.instances, SizeIs(1));
+    const cimom::Instance& instance = *response.instances[0];
     EXPECT_THAT(propertyNames(instance),
                 ::testing::UnorderedElementsAre(
                     "ElementName", "RequestedState", "SystemCreationClassName", "SystemName",
@@ -91,20 +91,20 @@ TEST_F(CMPIDHCPProtocolEndpointTest, InstanceHasJustThePropertiesThatAreKnown) {
 
 TEST_F(CMPIDHCPProtocolEndpointTest, EndpointWithoutALeaseHasNoLeaseProperties) {
     setTree({host({dhcpInterface("eth0")})});
-    const Host::Answer answer = host_.enumerate(pathOf(className));
-    ASSERT_THAT(answer.instances, SizeIs(1));
+    const Host::Response response = host_.enumerate(pathOf(className));
+    ASSERT_THAT(response.instances, SizeIs(1));
     for (const char* name : {"LeaseObtained", "LeaseExpires", "LeaseTime", "RenewalTime",
                              "RebindingTime", "InstallDate", "Caption"}) {
-        EXPECT_EQ(answer.instances[0]->property(name), nullptr) << name;
+        EXPECT_EQ(response.instances[0]->property(name), nullptr) << name;
     }
 }
 
 TEST_F(CMPIDHCPProtocolEndpointTest, StatesThatCannotBeReadAreZero) {
     setTree({host({test::interface("eth0", {{"DHCPEnabled", true}, {"AddressSource", 1}})})});
-    const Host::Answer answer = host_.enumerate(pathOf(className));
-    ASSERT_THAT(answer.instances, SizeIs(1));
-    EXPECT_EQ(test::numberOf(*answer.instances[0], "EnabledState"), 0U);
-    EXPECT_EQ(test::numberOf(*answer.instances[0], "ClientState"), 0U);
+    const Host::Response response = host_.enumerate(pathOf(className));
+    ASSERT_THAT(response.instances, SizeIs(1));
+    EXPECT_EQ(test::numberOf(*response.instances[0], "EnabledState"), 0U);
+    EXPECT_EQ(test::numberOf(*response.instances[0], "ClientState"), 0U);
 }
 
 TEST_F(CMPIDHCPProtocolEndpointTest, PathWithoutKeysGivesEveryEndpoint) {
@@ -132,10 +132,10 @@ TEST_F(CMPIDHCPProtocolEndpointTest, NameAloneOrSystemNameAloneFilterByThatAlone
 
 TEST_F(CMPIDHCPProtocolEndpointTest, OtherKeysAreNotCompared) {
     setTree({host({dhcpInterface("eth0")})});
-    const auto answer =
+    const auto response =
         host_.enumerateNames(pathOf(className, {{"CreationClassName", "Another_Class"},
                                                 {"SystemCreationClassName", "Another_System"}}));
-    EXPECT_THAT(keysOf(answer, "Name"), ElementsAre("eth0"));
+    EXPECT_THAT(keysOf(response, "Name"), ElementsAre("eth0"));
 }
 
 TEST_F(CMPIDHCPProtocolEndpointTest, KeysThatMatchNothingGiveAnEmptyWalk) {
@@ -146,20 +146,20 @@ TEST_F(CMPIDHCPProtocolEndpointTest, KeysThatMatchNothingGiveAnEmptyWalk) {
 TEST_F(CMPIDHCPProtocolEndpointTest, PropertyListDoesNotShrinkTheInstance) {
     setTree({host({dhcpInterface("eth0")})});
     const char* list[] = {"Name", nullptr};
-    const Host::Answer answer = host_.enumerate(pathOf(className), list);
-    ASSERT_THAT(answer.instances, SizeIs(1));
-    EXPECT_THAT(answer.instances[0]->properties, SizeIs(13));
+    const Host::Response response = host_.enumerate(pathOf(className), list);
+    ASSERT_THAT(response.instances, SizeIs(1));
+    EXPECT_THAT(response.instances[0]->properties, SizeIs(13));
 }
 
 TEST_F(CMPIDHCPProtocolEndpointTest, KeyWhoseGetterFailsIsLeftOut) {
     setTree({host({{{"type", "NetworkInterface"},
                     {"description", "nameless"},
                     {"properties", {{"DHCPEnabled", true}}}}})});
-    const Host::Answer answer = host_.enumerate(pathOf(className));
-    ASSERT_THAT(answer.instances, SizeIs(1));
+    const Host::Response response = host_.enumerate(pathOf(className));
+    ASSERT_THAT(response.instances, SizeIs(1));
     // A name that cannot be read is the empty name; there is no element name then.
-    EXPECT_EQ(test::textOf(*answer.instances[0], "Name"), "");
-    EXPECT_EQ(answer.instances[0]->property("ElementName"), nullptr);
+    EXPECT_EQ(test::textOf(*response.instances[0], "Name"), "");
+    EXPECT_EQ(response.instances[0]->property("ElementName"), nullptr);
 }
 
 TEST_F(CMPIDHCPProtocolEndpointTest, AnAdapterPastItsEndHasNoPath) {

@@ -31,9 +31,9 @@ class CMPIDHCPRemoteServiceAccessPointTest : public test::TreeTest {
 
 TEST_F(CMPIDHCPRemoteServiceAccessPointTest, OneInstancePerServerAddress) {
     setTree({host({dhcpInterface("eth0", {"192.0.2.1", "2001:db8::1"}), dhcpInterface("eth1")})});
-    const Host::Answer answer = host_.enumerate(pathOf(className));
-    ASSERT_THAT(answer.instances, SizeIs(2));
-    const cimom::Instance& first = *answer.instances[0];
+    const Host::Response response = host_.enumerate(pathOf(className));
+    ASSERT_THAT(response.instances, SizeIs(2));
+    const cimom::Instance& first = *response.instances[0];
     EXPECT_EQ(test::textOf(first, "ElementName"), "DHCP Server");
     EXPECT_EQ(test::textOf(first, "AccessInfo"), "192.0.2.1");
     EXPECT_EQ(test::numberOf(first, "InfoFormat"), 3U);
@@ -43,7 +43,7 @@ TEST_F(CMPIDHCPRemoteServiceAccessPointTest, OneInstancePerServerAddress) {
     EXPECT_EQ(test::textOf(first, "CreationClassName"), className);
     EXPECT_EQ(test::textOf(first, "Name"), "eth0_IPv4");
     EXPECT_THAT(first.properties, SizeIs(8));
-    const cimom::Instance& second = *answer.instances[1];
+    const cimom::Instance& second = *response.instances[1];
     EXPECT_EQ(test::textOf(second, "AccessInfo"), "2001:db8::1");
     EXPECT_EQ(test::numberOf(second, "InfoFormat"), 4U);
     EXPECT_EQ(test::textOf(second, "Name"), "eth0_IPv6");
@@ -51,9 +51,9 @@ TEST_F(CMPIDHCPRemoteServiceAccessPointTest, OneInstancePerServerAddress) {
 
 TEST_F(CMPIDHCPRemoteServiceAccessPointTest, ServerOfTheServiceProcessorHasTheHostsName) {
     setTree({serviceProcessor({dhcpInterface("bmc0", {"192.0.2.1"})})});
-    const Host::Answer answer = host_.enumerateNames(pathOf(className));
-    EXPECT_THAT(keysOf(answer, "SystemName"), ElementsAre(hostName()));
-    EXPECT_THAT(keysOf(answer, "SystemCreationClassName"), ElementsAre("QVXZR_SPComputerSystem"));
+    const Host::Response response = host_.enumerateNames(pathOf(className));
+    EXPECT_THAT(keysOf(response, "SystemName"), ElementsAre(hostName()));
+    EXPECT_THAT(keysOf(response, "SystemCreationClassName"), ElementsAre("QVXZR_SPComputerSystem"));
 }
 
 TEST_F(CMPIDHCPRemoteServiceAccessPointTest, NameAloneSelectsAcrossAllSystems) {
@@ -68,10 +68,10 @@ TEST_F(CMPIDHCPRemoteServiceAccessPointTest, SystemNameOfAnotherComputerSelectsN
     setTree({host({dhcpInterface("eth0", {"192.0.2.1"}), dhcpInterface("eth1", {"192.0.2.2"})})});
     // The filter moves the cursor past the end, but the addresses that were loaded
     // before stay: their one record is still there, without a path to tell.
-    const Host::Answer answer =
+    const Host::Response response =
         host_.enumerateNames(pathOf(className, {{"SystemName", "elsewhere"}}));
-    ASSERT_THAT(answer.paths, SizeIs(1));
-    EXPECT_EQ(test::keyOf(*answer.paths[0], "Name"), "_IPv4");
+    ASSERT_THAT(response.paths, SizeIs(1));
+    EXPECT_EQ(test::keyOf(*response.paths[0], "Name"), "_IPv4");
 }
 
 TEST_F(CMPIDHCPRemoteServiceAccessPointTest, NoServersGiveNothing) {

@@ -65,9 +65,9 @@ TEST_F(CMPIDHCPSettingDataTest, EveryInterfaceHasASetting) {
 
 TEST_F(CMPIDHCPSettingDataTest, InstanceHasWhatIsKnownAndNothingElse) {
     writeFile(file("eth0"), "CONFIG_NAME=office\n");
-    const Host::Answer answer = host_.enumerate(pathOf(className));
-    ASSERT_THAT(answer.instances, SizeIs(2));
-    const cimom::Instance& setting = *answer.instances[0];
+    const Host::Response response = host_.enumerate(pathOf(className));
+    ASSERT_THAT(response.instances, SizeIs(2));
+    const cimom::Instance& setting = *response.instances[0];
     EXPECT_EQ(test::textOf(setting, "InstanceID"), "Computer%eth0");
     EXPECT_EQ(test::textOf(setting, "ElementName"), "eth0");
     EXPECT_EQ(test::numberOf(setting, "AddressOrigin"), 4U);
@@ -77,14 +77,14 @@ TEST_F(CMPIDHCPSettingDataTest, InstanceHasWhatIsKnownAndNothingElse) {
                              "RequestedLeaseTime", "ChangeableType"}) {
         EXPECT_EQ(setting.property(name), nullptr) << name;
     }
-    EXPECT_EQ(answer.instances[1]->property("RequestedIPv4Address"), nullptr);
+    EXPECT_EQ(response.instances[1]->property("RequestedIPv4Address"), nullptr);
 }
 
 TEST_F(CMPIDHCPSettingDataTest, WithoutAFileOrWithAnEmptyNameThereIsNoConfigurationName) {
     writeFile(file("eth1"), "CONFIG_NAME=\n");
-    const Host::Answer answer = host_.enumerate(pathOf(className));
-    ASSERT_THAT(answer.instances, SizeIs(2));
-    for (const auto& instance : answer.instances) {
+    const Host::Response response = host_.enumerate(pathOf(className));
+    ASSERT_THAT(response.instances, SizeIs(2));
+    for (const auto& instance : response.instances) {
         EXPECT_EQ(instance->property("ConfigurationName"), nullptr);
     }
 }
@@ -95,9 +95,9 @@ TEST_F(CMPIDHCPSettingDataTest, ModifyWritesTheNameIntoTheFileOfThatInterface) {
     const auto instance = instanceWith({{"ConfigurationName", cimom::Value::ofString("office")},
                                         {"ElementName", cimom::Value::ofString("ignored")},
                                         {"InstanceID", cimom::Value::ofString("Computer%eth1")}});
-    const Host::Answer answer = host_.modify(pathOfSetting("Computer%eth0"), &instance);
-    EXPECT_EQ(answer.code, CMPI_RC_OK);
-    EXPECT_EQ(answer.returnDoneCalls, 1U);
+    const Host::Response response = host_.modify(pathOfSetting("Computer%eth0"), &instance);
+    EXPECT_EQ(response.code, CMPI_RC_OK);
+    EXPECT_EQ(response.returnDoneCalls, 1U);
     EXPECT_EQ(readFile(file("eth0")), "DEVICE=eth0\nCONFIG_NAME=office\n");
     EXPECT_EQ(readFile(file("eth1")), "CONFIG_NAME=other\n");
 }
@@ -127,7 +127,7 @@ TEST_F(CMPIDHCPSettingDataTest, ModifyOfAMissingSettingTouchesNoFile) {
 
 TEST_F(CMPIDHCPSettingDataTest, AdapterOnNothingWritesNothing) {
     writeFile(file("eth0"), "CONFIG_NAME=old\n");
-    Host::Answer answer = host_.request(
+    Host::Response response = host_.request(
         Host::Kind::instances, pathOfSetting("Computer%eth9"),
         [&](auto* context, auto* /*result*/, auto* path) {
             ZR::DHCPClientProvider::CMPIDHCPSettingData adapter(host_.broker(), context, path);
@@ -136,7 +136,7 @@ TEST_F(CMPIDHCPSettingDataTest, AdapterOnNothingWritesNothing) {
             ZR::ProviderUtilities::setProperty(instance, "ConfigurationName", std::string("x"));
             return adapter.modifyInstance(instance);
         });
-    EXPECT_EQ(answer.code, CMPI_RC_OK);
+    EXPECT_EQ(response.code, CMPI_RC_OK);
     EXPECT_EQ(readFile(file("eth0")), "CONFIG_NAME=old\n");
 }
 
@@ -147,7 +147,7 @@ TEST_F(CMPIDHCPSettingDataTest, NoNewInstanceFailsAndLeavesTheFile) {
 }
 
 // The getter hands out one number, where the schema has an array; it always refuses,
-// so that the scalar never meets the schema. Were it to answer, a scalar would be set.
+// so that the scalar never meets the schema. Were it to respond, a scalar would be set.
 TEST_F(CMPIDHCPSettingDataTest, RequestedOptionsIsAScalarThatIsNeverTold) {
     using Getter = bool (ZR::DHCPClientProvider::DHCPSettingData::*)(unsigned short&) const;
     const Getter getter = &ZR::DHCPClientProvider::DHCPSettingData::getRequestedOptions;

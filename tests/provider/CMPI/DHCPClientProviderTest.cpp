@@ -184,21 +184,21 @@ TEST_F(DHCPClientProviderTest, ClassIdentificationTracesItsEntryAndExit) {
 
 TEST_F(DHCPClientProviderTest, EndpointNamesAreDeliveredAndTheResultIsClosedOnce) {
     setTree({host({dhcpInterface("eth0"), staticInterface("eth1"), dhcpInterface("eth2")})});
-    const Host::Answer answer = host_.enumerateNames(pathOf(endpointClass));
-    EXPECT_EQ(answer.code, CMPI_RC_OK);
-    EXPECT_FALSE(answer.hasMessage);
-    EXPECT_THAT(keysOf(answer, "Name"), ElementsAre("eth0", "eth2"));
-    EXPECT_EQ(answer.returnDoneCalls, 1U);
+    const Host::Response response = host_.enumerateNames(pathOf(endpointClass));
+    EXPECT_EQ(response.code, CMPI_RC_OK);
+    EXPECT_FALSE(response.hasMessage);
+    EXPECT_THAT(keysOf(response, "Name"), ElementsAre("eth0", "eth2"));
+    EXPECT_EQ(response.returnDoneCalls, 1U);
 }
 
 TEST_F(DHCPClientProviderTest, SettingDataIsDeliveredWhollyAndTheResultIsLeftOpen) {
     setTree({host({dhcpInterface("eth0"), staticInterface("eth1")}),
              serviceProcessor({dhcpInterface("bmc0")})});
-    const Host::Answer answer = host_.enumerateNames(pathOf(settingClass));
-    EXPECT_EQ(answer.code, CMPI_RC_OK);
-    EXPECT_THAT(keysOf(answer, "InstanceID"),
+    const Host::Response response = host_.enumerateNames(pathOf(settingClass));
+    EXPECT_EQ(response.code, CMPI_RC_OK);
+    EXPECT_THAT(keysOf(response, "InstanceID"),
                 ElementsAre("Computer%eth0", "Computer%eth1", "BMC%bmc0"));
-    EXPECT_EQ(answer.returnDoneCalls, 0U);
+    EXPECT_EQ(response.returnDoneCalls, 0U);
 }
 
 struct EndingCase {
@@ -230,14 +230,14 @@ INSTANTIATE_TEST_SUITE_P(Elements, ResultEndings,
 TEST_F(DHCPClientProviderTest, UnknownClassIsInvalidWithoutResultsOrAnEnd) {
     for (const char* name : {"CIM_DHCPProtocolEndpoint", "QVXZR_ComputerSystem",
                              "QVXZR_SPComputerSystem", "CIM_ManagedElement"}) {
-        for (const Host::Answer& answer :
+        for (const Host::Response& response :
              {host_.enumerateNames(pathOf(name)), host_.enumerate(pathOf(name)),
               host_.get(pathOf(name))}) {
-            EXPECT_EQ(answer.code, CMPI_RC_ERR_INVALID_CLASS) << name;
-            EXPECT_FALSE(answer.hasMessage);
-            EXPECT_THAT(answer.paths, IsEmpty());
-            EXPECT_THAT(answer.instances, IsEmpty());
-            EXPECT_EQ(answer.returnDoneCalls, 0U);
+            EXPECT_EQ(response.code, CMPI_RC_ERR_INVALID_CLASS) << name;
+            EXPECT_FALSE(response.hasMessage);
+            EXPECT_THAT(response.paths, IsEmpty());
+            EXPECT_THAT(response.instances, IsEmpty());
+            EXPECT_EQ(response.returnDoneCalls, 0U);
         }
     }
 }
@@ -246,24 +246,24 @@ TEST_F(DHCPClientProviderTest, AnyNamespaceIsServedAndKept) {
     setTree({host({dhcpInterface("eth0")})});
     cimom::ObjectPath path = pathOf(endpointClass);
     path.nameSpace = "root/elsewhere";
-    const Host::Answer answer = host_.enumerateNames(path);
-    ASSERT_THAT(answer.paths, SizeIs(1));
-    EXPECT_EQ(answer.paths[0]->nameSpace, "root/elsewhere");
+    const Host::Response response = host_.enumerateNames(path);
+    ASSERT_THAT(response.paths, SizeIs(1));
+    EXPECT_EQ(response.paths[0]->nameSpace, "root/elsewhere");
 }
 
 TEST_F(DHCPClientProviderTest, GetYieldsWhatThePathNames) {
     setTree({host({dhcpInterface("eth0"), dhcpInterface("eth1")})});
-    const Host::Answer answer = host_.get(pathOf(endpointClass, {{"Name", "eth1"}}));
-    ASSERT_THAT(answer.instances, SizeIs(1));
-    EXPECT_EQ(test::textOf(*answer.instances[0], "Name"), "eth1");
+    const Host::Response response = host_.get(pathOf(endpointClass, {{"Name", "eth1"}}));
+    ASSERT_THAT(response.instances, SizeIs(1));
+    EXPECT_EQ(test::textOf(*response.instances[0], "Name"), "eth1");
 }
 
 TEST_F(DHCPClientProviderTest, GetOfAMissingObjectIsAnEmptySuccess) {
     setTree({host({dhcpInterface("eth0")})});
-    const Host::Answer answer = host_.get(pathOf(endpointClass, {{"Name", "eth9"}}));
-    EXPECT_EQ(answer.code, CMPI_RC_OK);
-    EXPECT_THAT(answer.instances, IsEmpty());
-    EXPECT_EQ(answer.returnDoneCalls, 1U);
+    const Host::Response response = host_.get(pathOf(endpointClass, {{"Name", "eth9"}}));
+    EXPECT_EQ(response.code, CMPI_RC_OK);
+    EXPECT_THAT(response.instances, IsEmpty());
+    EXPECT_EQ(response.returnDoneCalls, 1U);
 }
 
 TEST_F(DHCPClientProviderTest, GetOfHostedPointIsNotSupportedAndBuildsNoAdapter) {
@@ -271,9 +271,9 @@ TEST_F(DHCPClientProviderTest, GetOfHostedPointIsNotSupportedAndBuildsNoAdapter)
     const LogCapture log;
     for (const char* name :
          {"QVXZR_HostedDHCPPoint", "QVXZR_SAPSAPDependency", "QVXZR_DHCPElementCapabilities"}) {
-        const Host::Answer answer = host_.get(pathOf(name));
-        EXPECT_EQ(answer.code, CMPI_RC_ERR_NOT_SUPPORTED) << name;
-        EXPECT_EQ(answer.returnDoneCalls, 0U);
+        const Host::Response response = host_.get(pathOf(name));
+        EXPECT_EQ(response.code, CMPI_RC_ERR_NOT_SUPPORTED) << name;
+        EXPECT_EQ(response.returnDoneCalls, 0U);
     }
     for (const auto& line : log.log()) {
         EXPECT_THAT(line.file, ::testing::AnyOf("DHCPClientProvider", "include/Trace"));
@@ -309,9 +309,9 @@ TEST_F(DHCPClientProviderTest, ModifyOfAnotherClassIsNotSupportedAndDoesNotClose
     for (const char* name : {endpointClass, "QVXZR_DHCPCapabilities", "QVXZR_HostedDHCPPoint",
                              "CIM_DHCPSettingData"}) {
         const cimom::Instance instance;
-        const Host::Answer answer = host_.modify(pathOf(name), &instance);
-        EXPECT_EQ(answer.code, CMPI_RC_ERR_NOT_SUPPORTED) << name;
-        EXPECT_EQ(answer.returnDoneCalls, 0U);
+        const Host::Response response = host_.modify(pathOf(name), &instance);
+        EXPECT_EQ(response.code, CMPI_RC_ERR_NOT_SUPPORTED) << name;
+        EXPECT_EQ(response.returnDoneCalls, 0U);
     }
 }
 
@@ -319,19 +319,19 @@ TEST_F(DHCPClientProviderTest, ModifyOfAMissingSettingSucceedsAndClosesTheResult
     setTree({host({dhcpInterface("eth0")})});
     cimom::Instance instance;
     instance.path = pathOf(settingClass);
-    const Host::Answer answer =
+    const Host::Response response =
         host_.modify(pathOf(settingClass, {{"InstanceID", "Computer%eth9"}}), &instance);
-    EXPECT_EQ(answer.code, CMPI_RC_OK);
-    EXPECT_EQ(answer.returnDoneCalls, 1U);
+    EXPECT_EQ(response.code, CMPI_RC_OK);
+    EXPECT_EQ(response.returnDoneCalls, 1U);
 }
 
 TEST_F(DHCPClientProviderTest, ModifyThatFailsGivesItsCodeWithoutAMessage) {
     setTree({host({dhcpInterface("eth0")})});
-    const Host::Answer answer =
+    const Host::Response response =
         host_.modify(pathOf(settingClass, {{"InstanceID", "Computer%eth0"}}), nullptr);
-    EXPECT_EQ(answer.code, CMPI_RC_ERR_FAILED);
-    EXPECT_FALSE(answer.hasMessage);
-    EXPECT_EQ(answer.returnDoneCalls, 1U);
+    EXPECT_EQ(response.code, CMPI_RC_ERR_FAILED);
+    EXPECT_FALSE(response.hasMessage);
+    EXPECT_EQ(response.returnDoneCalls, 1U);
 }
 
 TEST_F(DHCPClientProviderTest, ModifyTracesThePathAsText) {
@@ -351,12 +351,12 @@ TEST_F(DHCPClientProviderTest, ExceptionHalfWayLeavesWhatWasDeliveredAndTheStatu
     setTree({host({dhcpInterface("eth0"), dhcpInterface("eth1"), dhcpInterface("eth2")})});
     const LogCapture log(6000, 6000);
     host_.counted().fail(Function::newObjectPath, 2, Fault::exception);
-    const Host::Answer answer = host_.enumerate(pathOf(endpointClass));
-    EXPECT_EQ(answer.code, CMPI_RC_OK);
-    EXPECT_FALSE(answer.hasMessage);
-    ASSERT_THAT(answer.instances, SizeIs(1));
-    EXPECT_EQ(test::textOf(*answer.instances[0], "Name"), "eth0");
-    EXPECT_EQ(answer.returnDoneCalls, 0U);
+    const Host::Response response = host_.enumerate(pathOf(endpointClass));
+    EXPECT_EQ(response.code, CMPI_RC_OK);
+    EXPECT_FALSE(response.hasMessage);
+    ASSERT_THAT(response.instances, SizeIs(1));
+    EXPECT_EQ(test::textOf(*response.instances[0], "Name"), "eth0");
+    EXPECT_EQ(response.returnDoneCalls, 0U);
     for (const auto& lines : {log.log(), log.trace()}) {
         ASSERT_THAT(lines, SizeIs(1));
         EXPECT_EQ(lines[0].level, 6000);
@@ -385,12 +385,12 @@ TEST_F(DHCPClientProviderTest, ObjectThatTheBrokerRefusesIsPassedOverWithOneFail
         setTree({host({dhcpInterface("eth0"), dhcpInterface("eth1"), dhcpInterface("eth2")})});
         const LogCapture log(6000, 6000);
         host_.counted().fail(Function::newInstance, 2, fault);
-        const Host::Answer answer = host_.enumerate(pathOf(endpointClass));
-        EXPECT_EQ(answer.code, CMPI_RC_OK);
-        ASSERT_THAT(answer.instances, SizeIs(2));
-        EXPECT_EQ(test::textOf(answer.instances[0].value(), "Name"), "eth0");
-        EXPECT_EQ(test::textOf(answer.instances[1].value(), "Name"), "eth2");
-        EXPECT_EQ(answer.returnDoneCalls, 1U);
+        const Host::Response response = host_.enumerate(pathOf(endpointClass));
+        EXPECT_EQ(response.code, CMPI_RC_OK);
+        ASSERT_THAT(response.instances, SizeIs(2));
+        EXPECT_EQ(test::textOf(response.instances[0].value(), "Name"), "eth0");
+        EXPECT_EQ(test::textOf(response.instances[1].value(), "Name"), "eth2");
+        EXPECT_EQ(response.returnDoneCalls, 1U);
         EXPECT_THAT(log.log(), SizeIs(1));
     }
 }

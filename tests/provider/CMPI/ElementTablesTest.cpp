@@ -85,16 +85,16 @@ TEST(ElementLists, EmptyListThatIsKnownIsAnEmptyArrayAndOneThatIsNotKnownIsLeftO
         property<&ElementWithLists::getUnknown>("OperationalStatus"),
     };
     Host host;
-    const Host::Answer answer = host.request(
+    const Host::Response response = host.request(
         Host::Kind::instances, test::pathOf("QVXZR_DHCPProtocolEndpoint"),
         [&](auto* /*context*/, auto* result, auto* path) {
             return result->ft->returnInstance(
                 result, makeInstance<ElementWithLists>(host.broker(), path, {}, properties));
         });
-    ASSERT_EQ(answer.instances.size(), 1U);
-    ASSERT_TRUE(answer.instances[0]);
+    ASSERT_EQ(response.instances.size(), 1U);
+    ASSERT_TRUE(response.instances[0]);
     const auto expectEmpty = [&](const char* name, cimom::Type type) {
-        const cimom::Value* const value = answer.instances[0]->property(name);
+        const cimom::Value* const value = response.instances[0]->property(name);
         ASSERT_NE(value, nullptr) << name;
         EXPECT_EQ(value->type, type) << name;
         ASSERT_NE(value->array(), nullptr) << name;
@@ -102,7 +102,7 @@ TEST(ElementLists, EmptyListThatIsKnownIsAnEmptyArrayAndOneThatIsNotKnownIsLeftO
     };
     expectEmpty("OptionsReceived", cimom::Type::uint16);
     expectEmpty("StatusDescriptions", cimom::Type::string);
-    EXPECT_EQ(answer.instances[0]->property("OperationalStatus"), nullptr);
+    EXPECT_EQ(response.instances[0]->property("OperationalStatus"), nullptr);
 }
 
 template <typename Row>

@@ -38,7 +38,7 @@ class HostNameTest : public test::TreeTest, public ::testing::WithParamInterface
 TEST_P(HostNameTest, ThatCannotBeHadIsLeftOutOfKeysAndPropertiesAndToldByItsGetter) {
     const ZR::Testing::HostNameFails failing;
     const LogCapture log(6000, 6000);
-    const Host::Answer names = host_.enumerateNames(pathOf(GetParam()));
+    const Host::Response names = host_.enumerateNames(pathOf(GetParam()));
     EXPECT_EQ(names.code, CMPI_RC_OK);
     ASSERT_THAT(names.paths, SizeIs(1));
     EXPECT_EQ(names.paths[0]->key("SystemName"), nullptr);
@@ -48,7 +48,7 @@ TEST_P(HostNameTest, ThatCannotBeHadIsLeftOutOfKeysAndPropertiesAndToldByItsGett
     EXPECT_EQ(log.log()[0].function, "getSystemName");
     EXPECT_EQ(log.log()[0].file, "Lindows/" + std::string(GetParam()).substr(6));
     EXPECT_TRUE(log.log()[0].message.ends_with("gethostname Failed"));
-    const Host::Answer instances = host_.enumerate(pathOf(GetParam()));
+    const Host::Response instances = host_.enumerate(pathOf(GetParam()));
     ASSERT_THAT(instances.instances, SizeIs(1));
     EXPECT_EQ(instances.instances[0]->property("SystemName"), nullptr);
     EXPECT_EQ(textOf(*instances.instances[0], "SystemCreationClassName"), "QVXZR_ComputerSystem");
@@ -60,7 +60,7 @@ TEST_P(HostNameTest, ThatCannotBeHadIsLeftOutOfKeysAndPropertiesAndToldByItsGett
 TEST_P(HostNameTest, ThatIsEmptyIsAnEmptyKeyAndProperty) {
     const ZR::Testing::HostNameIsEmpty empty;
     const LogCapture log(6000, 6000);
-    const Host::Answer instances = host_.enumerate(pathOf(GetParam()));
+    const Host::Response instances = host_.enumerate(pathOf(GetParam()));
     ASSERT_THAT(instances.instances, SizeIs(1));
     EXPECT_EQ(keyOf(instances.instances[0]->path, "SystemName"), "");
     EXPECT_EQ(textOf(*instances.instances[0], "SystemName"), "");

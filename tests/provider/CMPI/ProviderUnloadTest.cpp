@@ -33,12 +33,12 @@ TEST_F(UnloadTest, AThousandLoadsLoseNoDescriptor) {
         // Watching the machine's files and giving that up again costs the kernel
         // milliseconds; a request now and then is enough to lose something.
         if (load % 50 == 0) {
-            const test::Host::Answer answer =
+            const test::Host::Response response =
                 host.request(test::Host::Kind::paths, test::pathOf("QVXZR_DHCPProtocolEndpoint"),
                              [mi](auto* context, auto* result, auto* path) {
                                  return mi->ft->enumerateInstanceNames(mi, context, result, path);
                              });
-            ASSERT_EQ(answer.paths.size(), 1U);
+            ASSERT_EQ(response.paths.size(), 1U);
         }
         EXPECT_EQ(mi->ft->cleanup(mi, nullptr, 0).rc, CMPI_RC_OK);
         ASSERT_EQ(::dlclose(handle), 0);

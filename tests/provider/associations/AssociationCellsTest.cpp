@@ -54,19 +54,19 @@ class AssociationCells : public test::MachineTest, public ::testing::WithParamIn
     }
 
     /// Names and instances are the same objects; each is told when it cannot be.
-    void expectAssociators(const Host::Answer& answer, const LogCapture& log) const {
-        EXPECT_EQ(answer.code, CMPI_RC_OK);
-        EXPECT_FALSE(answer.hasMessage);
-        EXPECT_EQ(briefs(answer), ofHost(GetParam().associators));
-        EXPECT_EQ(answer.returnDoneCalls, 1U);
+    void expectAssociators(const Host::Response& response, const LogCapture& log) const {
+        EXPECT_EQ(response.code, CMPI_RC_OK);
+        EXPECT_FALSE(response.hasMessage);
+        EXPECT_EQ(briefs(response), ofHost(GetParam().associators));
+        EXPECT_EQ(response.returnDoneCalls, 1U);
         EXPECT_EQ(failuresOf(log), Texts(GetParam().steps, nothingToDeliver));
     }
 
-    void expectReferences(const Host::Answer& answer) const {
-        EXPECT_EQ(answer.code, CMPI_RC_OK);
-        EXPECT_FALSE(answer.hasMessage);
-        EXPECT_EQ(briefs(answer), ofHost(GetParam().references));
-        EXPECT_EQ(answer.returnDoneCalls, GetParam().failure == nullptr ? 1U : 0U);
+    void expectReferences(const Host::Response& response) const {
+        EXPECT_EQ(response.code, CMPI_RC_OK);
+        EXPECT_FALSE(response.hasMessage);
+        EXPECT_EQ(briefs(response), ofHost(GetParam().references));
+        EXPECT_EQ(response.returnDoneCalls, GetParam().failure == nullptr ? 1U : 0U);
     }
 
     Host host_{Host::Neighbours::served};
@@ -84,7 +84,7 @@ TEST_P(AssociationCells, Associators) {
 }
 
 TEST_P(AssociationCells, FarEndsGoByTheirClassAndByTheStandardOne) {
-    const Host::Answer all = host_.associatorNames(source_, GetParam().association);
+    const Host::Response all = host_.associatorNames(source_, GetParam().association);
     if (all.paths.empty()) {
         EXPECT_EQ(GetParam().associators, Texts{});
         return;

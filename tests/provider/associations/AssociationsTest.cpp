@@ -43,7 +43,7 @@ class AssociationsTest : public test::MachineTest {
 constexpr const char* hosted = "QVXZR_HostedDHCPPoint";
 
 TEST_F(AssociationsTest, EndpointHasItsComputer) {
-    const Host::Answer names = host_.associatorNames(endpoint("eth0"), hosted);
+    const Host::Response names = host_.associatorNames(endpoint("eth0"), hosted);
     EXPECT_EQ(names.code, CMPI_RC_OK);
     EXPECT_EQ(briefs(names), ofHost(Texts{"ComputerSystem @"}));
     EXPECT_EQ(names.returnDoneCalls, 1U);
@@ -61,7 +61,7 @@ TEST_F(AssociationsTest, EndpointOfTheServiceProcessorReachesItsComputer) {
 // The static interface agrees with the system name filter and is then skipped for
 // its DHCP flag; what follows it is not filtered again, and so is delivered too.
 TEST_F(AssociationsTest, ComputerHasItsEndpointsAndTheOneBehindAnInterfaceWithoutDHCP) {
-    const Host::Answer names = host_.associatorNames(computer(hostName()), hosted);
+    const Host::Response names = host_.associatorNames(computer(hostName()), hosted);
     EXPECT_EQ(briefs(names),
               ofHost(Texts{"DHCPProtocolEndpoint @ eth0", "DHCPProtocolEndpoint @ eth1",
                            "DHCPProtocolEndpoint @ eth2", "DHCPProtocolEndpoint BMC:-1 bmc0"}));
@@ -69,12 +69,12 @@ TEST_F(AssociationsTest, ComputerHasItsEndpointsAndTheOneBehindAnInterfaceWithou
 }
 
 TEST_F(AssociationsTest, ReferenceOfAnEndpointHasTheComputersPathAndAnEndpointPathOfOurs) {
-    const Host::Answer names = host_.referenceNames(endpoint("eth0"), hosted);
+    const Host::Response names = host_.referenceNames(endpoint("eth0"), hosted);
     ASSERT_EQ(names.code, CMPI_RC_OK);
     EXPECT_EQ(briefs(names), ofHost(Texts{"HostedDHCPPoint Antecedent[ComputerSystem @] "
                                           "Dependent[DHCPProtocolEndpoint @ eth0]"}));
     EXPECT_EQ(names.returnDoneCalls, 1U);
-    const Host::Answer instances = host_.references(endpoint("eth0"), hosted);
+    const Host::Response instances = host_.references(endpoint("eth0"), hosted);
     ASSERT_THAT(instances.instances, SizeIs(1));
     EXPECT_NE(instances.instances[0]->property("Antecedent"), nullptr);
     EXPECT_NE(instances.instances[0]->property("Dependent"), nullptr);
@@ -82,7 +82,7 @@ TEST_F(AssociationsTest, ReferenceOfAnEndpointHasTheComputersPathAndAnEndpointPa
 }
 
 TEST_F(AssociationsTest, EnumeratingTheHostedClassYieldsThePairs) {
-    const Host::Answer names = host_.enumerateNames(pathOf(hosted));
+    const Host::Response names = host_.enumerateNames(pathOf(hosted));
     EXPECT_EQ(briefs(names), ofHost(Texts{"HostedDHCPPoint Antecedent[ComputerSystem @] "
                                           "Dependent[DHCPProtocolEndpoint @ eth0]",
                                           "HostedDHCPPoint Antecedent[ComputerSystem @] "
@@ -111,32 +111,33 @@ TEST_F(AssociationsTest, ResultClassIsComparedWithoutCaseButNoSuperclassCounts) 
     EXPECT_THAT(briefs(host_.associatorNames(path, hosted, "QVXZR_DHCPPROTOCOLENDPOINT")),
                 SizeIs(4));
     for (const char* other : {"CIM_ProtocolEndpoint", "CIM_ComputerSystem", "", "x"}) {
-        const Host::Answer answer = host_.associatorNames(path, hosted, other);
-        EXPECT_THAT(answer.paths, IsEmpty()) << other;
-        EXPECT_EQ(answer.code, CMPI_RC_OK);
-        EXPECT_EQ(answer.returnDoneCalls, 1U);
+        const Host::Response response = host_.associatorNames(path, hosted, other);
+        EXPECT_THAT(response.paths, IsEmpty()) << other;
+        EXPECT_EQ(response.code, CMPI_RC_OK);
+        EXPECT_EQ(response.returnDoneCalls, 1U);
     }
 }
 
 // Association requests and the classes that they name.
 
 TEST_F(AssociationsTest, StandardParentRunsBothHostedAssociationsAndEndsOnce) {
-    const Host::Answer answer =
+    const Host::Response response =
         host_.associatorNames(computer(hostName()), "CIM_HostedAccessPoint");
-    EXPECT_EQ(briefs(answer),
+    EXPECT_EQ(briefs(response),
               ofHost(Texts{"DHCPProtocolEndpoint @ eth0", "DHCPProtocolEndpoint @ eth1",
                            "DHCPProtocolEndpoint @ eth2", "DHCPProtocolEndpoint BMC:-1 bmc0",
                            "DHCPRemoteServiceAccessPoint @ eth0_IPv4",
                            "DHCPRemoteServiceAccessPoint @ eth1_IPv4",
                            "DHCPRemoteServiceAccessPoint @ eth1_IPv6"}));
-    EXPECT_EQ(answer.returnDoneCalls, 1U);
+    EXPECT_EQ(response.returnDoneCalls, 1U);
 }
 
 TEST_F(AssociationsTest, StandardParentRunsTheSecondAlsoWhenTheSourceTakesNoPartInIt) {
     const LogCapture log(4000, 6000);
-    const Host::Answer answer = host_.associatorNames(endpoint("eth0"), "CIM_HostedAccessPoint");
-    EXPECT_EQ(briefs(answer), ofHost(Texts{"ComputerSystem @"}));
-    EXPECT_EQ(answer.returnDoneCalls, 1U);
+    const Host::Response response =
+        host_.associatorNames(endpoint("eth0"), "CIM_HostedAccessPoint");
+    EXPECT_EQ(briefs(response), ofHost(Texts{"ComputerSystem @"}));
+    EXPECT_EQ(response.returnDoneCalls, 1U);
     std::vector<std::string> adapters;
     for (const auto& line : log.log()) {
         if (line.function.starts_with("~") && line.file.ends_with("HostedAccessPoint") &&
@@ -171,11 +172,11 @@ TEST_F(AssociationsTest, RolesChangeNothing) {
 }
 
 TEST_F(AssociationsTest, UnknownAssociationClassIsAnEmptySuccessForNamesAndInvalidForInstances) {
-    const Host::Answer names = host_.associatorNames(endpoint("eth0"), "CIM_NoSuchClass");
+    const Host::Response names = host_.associatorNames(endpoint("eth0"), "CIM_NoSuchClass");
     EXPECT_EQ(names.code, CMPI_RC_OK);
     EXPECT_THAT(names.paths, IsEmpty());
     EXPECT_EQ(names.returnDoneCalls, 1U);
-    const Host::Answer instances = host_.associators(endpoint("eth0"), "CIM_NoSuchClass");
+    const Host::Response instances = host_.associators(endpoint("eth0"), "CIM_NoSuchClass");
     EXPECT_EQ(instances.code, CMPI_RC_ERR_INVALID_CLASS);
     EXPECT_FALSE(instances.hasMessage);
     EXPECT_THAT(instances.instances, IsEmpty());
@@ -214,11 +215,11 @@ TEST_F(AssociationsTest, UnknownAssociationClassIsTracedOnceByItsHandlerAndAKnow
 
 TEST_F(AssociationsTest, ElementClassAsAssociationClassIsInvalidAndLeavesTheResultOpen) {
     const LogCapture log(4000);
-    for (const Host::Answer& answer :
+    for (const Host::Response& response :
          {host_.associatorNames(endpoint("eth0"), "QVXZR_DHCPSettingData"),
           host_.associators(endpoint("eth0"), "QVXZR_DHCPSettingData")}) {
-        EXPECT_EQ(answer.code, CMPI_RC_ERR_INVALID_CLASS);
-        EXPECT_EQ(answer.returnDoneCalls, 0U);
+        EXPECT_EQ(response.code, CMPI_RC_ERR_INVALID_CLASS);
+        EXPECT_EQ(response.returnDoneCalls, 0U);
     }
     EXPECT_THAT(log.logMessages(),
                 ::testing::Contains(::testing::StartsWith("VARIABLE: 'rcode' has Value '0'")));
@@ -227,14 +228,14 @@ TEST_F(AssociationsTest, ElementClassAsAssociationClassIsInvalidAndLeavesTheResu
 TEST_F(AssociationsTest, ReferencesServeOnlyTheExactClass) {
     for (const char* name :
          {"CIM_ElementSettingData", "CIM_HostedAccessPoint", "CIM_NoSuchClass"}) {
-        for (const Host::Answer& answer : {host_.referenceNames(endpoint("eth0"), name),
-                                           host_.references(endpoint("eth0"), name)}) {
-            EXPECT_EQ(answer.code, CMPI_RC_ERR_INVALID_CLASS) << name;
-            EXPECT_EQ(answer.returnDoneCalls, 0U);
+        for (const Host::Response& response : {host_.referenceNames(endpoint("eth0"), name),
+                                               host_.references(endpoint("eth0"), name)}) {
+            EXPECT_EQ(response.code, CMPI_RC_ERR_INVALID_CLASS) << name;
+            EXPECT_EQ(response.returnDoneCalls, 0U);
         }
     }
     EXPECT_EQ(host_.referenceNames(endpoint("eth0"), nullptr).code, CMPI_RC_ERR_INVALID_CLASS);
-    const Host::Answer served =
+    const Host::Response served =
         host_.referenceNames(endpoint("eth0"), "QVXZR_DHCPElementSettingData");
     EXPECT_EQ(briefs(served),
               ofHost(Texts{"DHCPElementSettingData ManagedElement[DHCPProtocolEndpoint @ eth0] "
@@ -243,15 +244,15 @@ TEST_F(AssociationsTest, ReferencesServeOnlyTheExactClass) {
 }
 
 TEST_F(AssociationsTest, NoAssociationClassRunsAllSeven) {
-    const Host::Answer answer = host_.associatorNames(endpoint("eth0"), nullptr);
-    EXPECT_EQ(answer.code, CMPI_RC_OK);
+    const Host::Response response = host_.associatorNames(endpoint("eth0"), nullptr);
+    EXPECT_EQ(response.code, CMPI_RC_OK);
     EXPECT_EQ(
-        briefs(answer),
+        briefs(response),
         ofHost(Texts{"DHCPCapabilities eth0", "ComputerSystem @", "IPProtocolEndpoint @ eth0",
                      "DHCPRemoteServiceAccessPoint @ eth0_IPv4",
                      "DHCPRemoteServiceAccessPoint @ eth1_IPv4",
                      "DHCPRemoteServiceAccessPoint @ eth1_IPv6", "DHCPSettingData Computer%eth0"}));
-    EXPECT_EQ(answer.returnDoneCalls, 1U);
+    EXPECT_EQ(response.returnDoneCalls, 1U);
 }
 
 // The other six.
@@ -272,10 +273,10 @@ TEST_F(AssociationsTest, ReferenceOfAnIPEndpointIsRecomputedFromTheDHCPEndpoint)
     // The source path lacks a key that the recomputed reference has.
     const auto ip =
         pathOf("QVXZR_IPProtocolEndpoint", {{"SystemName", hostName()}, {"Name", "eth1"}});
-    const Host::Answer answer = host_.referenceNames(ip, "QVXZR_SAPSAPDependency");
-    ASSERT_THAT(answer.paths, SizeIs(1));
+    const Host::Response response = host_.referenceNames(ip, "QVXZR_SAPSAPDependency");
+    ASSERT_THAT(response.paths, SizeIs(1));
     const auto& antecedent = std::get<std::shared_ptr<const cimom::ObjectPath>>(
-        *answer.paths[0]->key("Antecedent")->scalar());
+        *response.paths[0]->key("Antecedent")->scalar());
     EXPECT_EQ(keyOf(*antecedent, "CreationClassName"), "QVXZR_IPProtocolEndpoint");
     EXPECT_EQ(keyOf(*antecedent, "Name"), "eth1");
 }
@@ -287,7 +288,7 @@ TEST_F(AssociationsTest, EndpointAndCapabilitiesLeadToEachOther) {
     const auto capabilities = pathOf("QVXZR_DHCPCapabilities", {{"InstanceID", "eth1"}});
     EXPECT_EQ(briefs(host_.associators(capabilities, name)),
               ofHost(Texts{"DHCPProtocolEndpoint @ eth1"}));
-    const Host::Answer references = host_.references(capabilities, name);
+    const Host::Response references = host_.references(capabilities, name);
     ASSERT_THAT(references.instances, SizeIs(1));
     EXPECT_EQ(references.instances[0]->property("Characteristics"), nullptr);
 }
@@ -323,9 +324,9 @@ TEST_F(AssociationsTest, EachEndIsAskedOnceInEachStepOfTheWalkOverHostedAccessPo
 
 TEST_F(AssociationsTest, OrderOfAccessOfAReferenceDependsOnWhereTheWalkStarted) {
     constexpr const char* name = "QVXZR_DHCPRemoteAccessAvailableToElement";
-    const auto order = [](const Host::Answer& answer) {
+    const auto order = [](const Host::Response& response) {
         std::vector<std::uint64_t> values;
-        for (const auto& instance : answer.instances) {
+        for (const auto& instance : response.instances) {
             values.push_back(test::numberOf(*instance, "OrderOfAccess").value_or(77));
         }
         return values;
@@ -356,7 +357,7 @@ TEST_F(AssociationsTest, EndpointAndSettingLeadToEachOther) {
     const auto setting = pathOf("QVXZR_DHCPSettingData", {{"InstanceID", "Computer%eth2"}});
     EXPECT_EQ(briefs(host_.associators(setting, name)),
               ofHost(Texts{"DHCPProtocolEndpoint @ eth2"}));
-    const Host::Answer references = host_.references(setting, name);
+    const Host::Response references = host_.references(setting, name);
     ASSERT_THAT(references.instances, SizeIs(1));
     EXPECT_EQ(test::numberOf(*references.instances[0], "IsCurrent"), 1U);
     EXPECT_EQ(references.instances[0]->property("IsCurrent")->type, cimom::Type::uint16);
@@ -366,9 +367,9 @@ TEST_F(AssociationsTest, EnumerationOfElementSettingDataEndsAtAnInterfaceWithout
     // The setting of the static interface has no endpoint: the walk ends there, and
     // what was delivered stays.
     const LogCapture log(6000, 6000);
-    const Host::Answer answer = host_.enumerateNames(pathOf("QVXZR_DHCPElementSettingData"));
-    EXPECT_EQ(answer.code, CMPI_RC_OK);
-    EXPECT_THAT(answer.paths, SizeIs(3));
+    const Host::Response response = host_.enumerateNames(pathOf("QVXZR_DHCPElementSettingData"));
+    EXPECT_EQ(response.code, CMPI_RC_OK);
+    EXPECT_THAT(response.paths, SizeIs(3));
     ASSERT_THAT(log.log(), SizeIs(1));
     EXPECT_THAT(log.log()[0].message,
                 ::testing::EndsWith("Could not get 'System Name' and  'Name' key"));
@@ -383,7 +384,7 @@ TEST_F(AssociationsTest, SettingAndAssignmentLeadToEachOther) {
         pathOf("QVXZR_IPAssignmentSettingData", {{"InstanceID", "Computer%eth3%dhcp"}});
     EXPECT_EQ(briefs(host_.associatorNames(assignment, name)),
               Texts{"DHCPSettingData Computer%eth3"});
-    const Host::Answer references = host_.references(assignment, name);
+    const Host::Response references = host_.references(assignment, name);
     ASSERT_THAT(references.instances, SizeIs(1));
     EXPECT_EQ(test::numberOf(*references.instances[0], "AssignedSequence"), 1U);
     EXPECT_EQ(references.instances[0]->property("AssignedSequence")->type, cimom::Type::uint64);
@@ -413,16 +414,16 @@ TEST_F(AssociationsTest, EnumeratingOrderedComponentsPlacesBothEndsByTheirPaths)
         reference.content = cimom::Scalar(std::make_shared<const cimom::ObjectPath>(path));
         narrowed.keys.push_back({role, reference});
     }
-    const Host::Answer got = host_.get(narrowed);
+    const Host::Response got = host_.get(narrowed);
     ASSERT_THAT(got.instances, SizeIs(1));
     EXPECT_EQ(test::numberOf(*got.instances[0], "AssignedSequence"), 1U);
 }
 
 TEST_F(AssociationsTest, AssignmentOfASettingIsFetchedSinglyThroughTheBroker) {
-    const Host::Answer answer =
+    const Host::Response response =
         host_.associators(pathOf("QVXZR_DHCPSettingData", {{"InstanceID", "Computer%eth1"}}),
                           "QVXZR_DHCPOrderedComponent");
-    EXPECT_EQ(briefs(answer), Texts{"IPAssignmentSettingData Computer%eth1%dhcp"});
+    EXPECT_EQ(briefs(response), Texts{"IPAssignmentSettingData Computer%eth1%dhcp"});
     EXPECT_EQ(host_.counted().calls(Function::getInstance), 1U);
     EXPECT_EQ(host_.counted().calls(Function::enumerateInstances), 0U);
 }
@@ -430,12 +431,12 @@ TEST_F(AssociationsTest, AssignmentOfASettingIsFetchedSinglyThroughTheBroker) {
 TEST_F(AssociationsTest, MissingAssignmentFailsWithTheComputersMessageAndStaysOk) {
     Host withoutNeighbours;
     const LogCapture log(6000, 6000);
-    const Host::Answer answer = withoutNeighbours.associators(
+    const Host::Response response = withoutNeighbours.associators(
         pathOf("QVXZR_DHCPSettingData", {{"InstanceID", "Computer%eth0"}}),
         "QVXZR_DHCPOrderedComponent");
-    EXPECT_EQ(answer.code, CMPI_RC_OK);
-    EXPECT_THAT(answer.instances, IsEmpty());
-    EXPECT_EQ(answer.returnDoneCalls, 1U);
+    EXPECT_EQ(response.code, CMPI_RC_OK);
+    EXPECT_THAT(response.instances, IsEmpty());
+    EXPECT_EQ(response.returnDoneCalls, 1U);
     ASSERT_THAT(log.log(), SizeIs(1));
     EXPECT_THAT(log.log()[0].message,
                 ::testing::EndsWith("Could not obtain an instance of Computer System"));
@@ -459,7 +460,7 @@ TEST_F(AssociationsTest, EndWithoutAPathLeavesItsReferenceOut) {
                            "HostedDHCPPoint Dependent[DHCPProtocolEndpoint @ eth2]",
                            "HostedDHCPPoint Dependent[DHCPProtocolEndpoint BMC:-1 bmc0]"}));
     host_.counted().fail(Function::enumerateInstances, 1, Fault::null);
-    const Host::Answer instances = host_.enumerate(pathOf(hosted));
+    const Host::Response instances = host_.enumerate(pathOf(hosted));
     ASSERT_THAT(instances.instances, SizeIs(4));
     EXPECT_EQ(instances.instances[0]->property("Antecedent"), nullptr);
     EXPECT_NE(instances.instances[0]->property("Dependent"), nullptr);
@@ -492,8 +493,8 @@ class SeveralComputersTest : public AssociationsTest {
         }
     }
 
-    Host::Answer names_;
-    Host::Answer instances_;
+    Host::Response names_;
+    Host::Response instances_;
 };
 
 TEST_F(SeveralComputersTest, WalkOverRemoteHostedAccessPointsEndsWithTheAccessPoints) {
@@ -553,12 +554,12 @@ TEST_F(AssociationsTest, EveryAssociationIsTracedAsServedAlsoTheOneThatFailed) {
 TEST_F(AssociationsTest, FailureInOneAssociationIsSilentForNamesAndLoggedForInstances) {
     Host withoutNeighbours;
     const LogCapture log(6000, 6000);
-    const Host::Answer names = withoutNeighbours.associatorNames(endpoint("eth2"), nullptr);
+    const Host::Response names = withoutNeighbours.associatorNames(endpoint("eth2"), nullptr);
     EXPECT_EQ(names.code, CMPI_RC_OK);
     EXPECT_EQ(briefs(names), (Texts{"DHCPCapabilities eth2", "DHCPSettingData Computer%eth2"}));
     EXPECT_EQ(names.returnDoneCalls, 1U);
     EXPECT_THAT(log.log(), IsEmpty());
-    const Host::Answer instances = withoutNeighbours.associators(endpoint("eth2"), nullptr);
+    const Host::Response instances = withoutNeighbours.associators(endpoint("eth2"), nullptr);
     EXPECT_EQ(instances.code, CMPI_RC_OK);
     EXPECT_EQ(briefs(instances), briefs(names));
     EXPECT_THAT(log.log(), SizeIs(3));
@@ -567,11 +568,11 @@ TEST_F(AssociationsTest, FailureInOneAssociationIsSilentForNamesAndLoggedForInst
 TEST_F(AssociationsTest, FailureOfReferencesLeavesTheResultOpenAndIsLoggedOnceForInstances) {
     Host withoutNeighbours;
     const LogCapture log(6000, 6000);
-    const Host::Answer names = withoutNeighbours.referenceNames(endpoint("eth0"), hosted);
+    const Host::Response names = withoutNeighbours.referenceNames(endpoint("eth0"), hosted);
     EXPECT_EQ(names.code, CMPI_RC_OK);
     EXPECT_EQ(names.returnDoneCalls, 0U);
     EXPECT_THAT(log.log(), IsEmpty());
-    const Host::Answer instances = withoutNeighbours.references(endpoint("eth0"), hosted);
+    const Host::Response instances = withoutNeighbours.references(endpoint("eth0"), hosted);
     EXPECT_EQ(instances.code, CMPI_RC_OK);
     EXPECT_EQ(instances.returnDoneCalls, 0U);
     EXPECT_THAT(log.log(), SizeIs(1));

@@ -64,12 +64,12 @@ void addPath(Parts& parts, const cimom::ObjectPath& path, const std::string& pre
     }
 }
 
-std::vector<Parts> objectsOf(const Host::Answer& answer) {
+std::vector<Parts> objectsOf(const Host::Response& response) {
     std::vector<Parts> objects;
-    for (const auto& path : answer.paths) {
+    for (const auto& path : response.paths) {
         addPath(objects.emplace_back(), path.value(), "");
     }
-    for (const auto& instance : answer.instances) {
+    for (const auto& instance : response.instances) {
         Parts& parts = objects.emplace_back();
         addPath(parts, instance.value().path, "");
         for (const cimom::NamedValue& property : instance->properties) {
@@ -128,11 +128,11 @@ std::optional<std::vector<std::string>> missing(const std::vector<Parts>& withou
 
 std::string effectOf(const Outcome& without, const Outcome& with) {
     std::vector<std::string> effects;
-    if (without.answer.code != with.answer.code) {
-        effects.push_back("status " + std::to_string(with.answer.code));
+    if (without.response.code != with.response.code) {
+        effects.push_back("status " + std::to_string(with.response.code));
     }
-    const std::vector<Parts> before = objectsOf(without.answer);
-    const std::vector<Parts> after = objectsOf(with.answer);
+    const std::vector<Parts> before = objectsOf(without.response);
+    const std::vector<Parts> after = objectsOf(with.response);
     if (before != after) {
         if (const auto numbers = missing(before, after)) {
             effects.push_back("without object " + join(*numbers, ", "));
@@ -144,11 +144,11 @@ std::string effectOf(const Outcome& without, const Outcome& with) {
                 }
             }
         } else {
-            effects.push_back("instead: " + join(briefs(with.answer), ", "));
+            effects.push_back("instead: " + join(briefs(with.response), ", "));
         }
     }
-    if (without.answer.returnDoneCalls != with.answer.returnDoneCalls) {
-        effects.push_back(with.answer.returnDoneCalls == 0 ? "left open" : "closed");
+    if (without.response.returnDoneCalls != with.response.returnDoneCalls) {
+        effects.push_back(with.response.returnDoneCalls == 0 ? "left open" : "closed");
     }
     if (without.file != with.file) {
         effects.push_back("file " + with.file.substr(0, with.file.find('\n')));

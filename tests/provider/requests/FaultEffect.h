@@ -9,7 +9,7 @@ namespace test {
 
 /// All that can be seen of a request from outside.
 struct Outcome {
-    Host::Answer answer;
+    Host::Response response;
     std::vector<std::string> failures;  ///< texts of the failure lines of the log
     std::string file;                   ///< content of the interface's configuration file
 };

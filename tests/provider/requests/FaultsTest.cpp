@@ -83,7 +83,7 @@ class FaultsTest : public test::TreeTest {
         for (std::size_t i = 0; i < test::functionCount; ++i) {
             const auto function = static_cast<Function>(i);
             for (const Fault fault : {Fault::null, Fault::status}) {
-                if (fault == Fault::null && !test::canAnswerNull(function)) {
+                if (fault == Fault::null && !test::canReturnNull(function)) {
                     continue;
                 }
                 for (unsigned call = 1;; ++call) {
@@ -166,27 +166,29 @@ TEST_P(AnyRequest, KeepsItsStatusAndWhatWasDeliveredWhateverCallFails) {
     const Request& request = GetParam();
     SCOPED_TRACE(request.name());
     const Outcome usual = outcomeOf(request);
-    const unsigned failed = failEachCall(request, [&](Function function, Fault fault, unsigned call,
-                                                      const Outcome& outcome) {
-        SCOPED_TRACE(std::string(test::nameOf(function)) +
-                     (fault == Fault::null ? " answers null" : " fails") + " at call " +
-                     std::to_string(call));
-        EXPECT_EQ(outcome.answer.code, expectedCode(request, usual.answer.code, function, call));
-        EXPECT_FALSE(outcome.answer.hasMessage);
-        const std::size_t delivered = host_.counted().deliveredBeforeFault();
-        EXPECT_EQ(firstOf(outcome.answer.paths, delivered), firstOf(usual.answer.paths, delivered));
-        EXPECT_EQ(firstOf(outcome.answer.instances, delivered),
-                  firstOf(usual.answer.instances, delivered));
-        EXPECT_LE(outcome.answer.returnDoneCalls, 1U);
-        unsigned exceptions = 0;
-        for (const std::string& failure : outcome.failures) {
-            EXPECT_TRUE(knownFailures.contains(failure)) << failure;
-            exceptions += failure == madeNoObject ? 0U : 1U;
-        }
-        if (!tellsOfExceptions(request)) {
-            EXPECT_EQ(exceptions, 0U);
-        }
-    });
+    const unsigned failed = failEachCall(
+        request, [&](Function function, Fault fault, unsigned call, const Outcome& outcome) {
+            SCOPED_TRACE(std::string(test::nameOf(function)) +
+                         (fault == Fault::null ? " returns null" : " fails") + " at call " +
+                         std::to_string(call));
+            EXPECT_EQ(outcome.response.code,
+                      expectedCode(request, usual.response.code, function, call));
+            EXPECT_FALSE(outcome.response.hasMessage);
+            const std::size_t delivered = host_.counted().deliveredBeforeFault();
+            EXPECT_EQ(firstOf(outcome.response.paths, delivered),
+                      firstOf(usual.response.paths, delivered));
+            EXPECT_EQ(firstOf(outcome.response.instances, delivered),
+                      firstOf(usual.response.instances, delivered));
+            EXPECT_LE(outcome.response.returnDoneCalls, 1U);
+            unsigned exceptions = 0;
+            for (const std::string& failure : outcome.failures) {
+                EXPECT_TRUE(knownFailures.contains(failure)) << failure;
+                exceptions += failure == madeNoObject ? 0U : 1U;
+            }
+            if (!tellsOfExceptions(request)) {
+                EXPECT_EQ(exceptions, 0U);
+            }
+        });
     EXPECT_GT(failed, 0U);
     EXPECT_EQ(test::effectOf(usual, outcomeOf(request)), test::effectOf(usual, usual))
         << "a failure leaves nothing behind";

@@ -161,11 +161,11 @@ TEST_F(ModificationTest, ExceptionBeforeTheChangeLeavesTheFileTheStatusAndTheRes
          {Function::toString, Function::getKeyCount, Function::getProperty}) {
         const LogCapture log(6000, 6000);
         host_.counted().fail(function, 1, Fault::exception);
-        const Host::Answer answer = test::run(host_, request_);
+        const Host::Response response = test::run(host_, request_);
         EXPECT_EQ(host_.counted().calls(function), 1U) << nameOf(function);
-        EXPECT_EQ(answer.code, CMPI_RC_OK) << nameOf(function);
-        EXPECT_FALSE(answer.hasMessage);
-        EXPECT_EQ(answer.returnDoneCalls, 0U) << nameOf(function);
+        EXPECT_EQ(response.code, CMPI_RC_OK) << nameOf(function);
+        EXPECT_FALSE(response.hasMessage);
+        EXPECT_EQ(response.returnDoneCalls, 0U) << nameOf(function);
         EXPECT_EQ(readFile(file_), "CONFIG_NAME=old\n") << nameOf(function);
         for (const auto& lines : {log.log(), log.trace()}) {
             ASSERT_THAT(lines, SizeIs(1)) << nameOf(function);

@@ -63,7 +63,7 @@ std::string Request::identifier() const {
     return text;
 }
 
-Host::Answer run(Host& host, const Request& request) {
+Host::Response run(Host& host, const Request& request) {
     const cimom::ObjectPath path = pathFrom(request.path);
     switch (request.operation) {
         case Operation::enumerateNames:

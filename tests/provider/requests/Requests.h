@@ -38,7 +38,7 @@ inline std::ostream& operator<<(std::ostream& out, const Request& request) {
 }
 
 /// Runs the request. A modify writes the configuration name "new".
-Host::Answer run(Host& host, const Request& request);
+Host::Response run(Host& host, const Request& request);
 
 /// An association class and a path of each of its ends, for the machine of this list:
 /// of the interface eth0 and of its one server at an IPv4 address.

@@ -188,7 +188,7 @@ class WorkTest : public test::TreeTest, public ::testing::WithParamInterface<Req
     Host host_{Host::Neighbours::served, Host::Calls::counted};
 };
 
-TEST_P(WorkTest, GrowsAsItsAnswerAndItsPrescribedWalksDo) {
+TEST_P(WorkTest, GrowsAsItsResponseAndTheWalksOfItsClientsDo) {
     const std::string identifier = GetParam().identifier();
     const auto expected =
         std::find_if(expectedWork.begin(), expectedWork.end(),
@@ -198,9 +198,10 @@ TEST_P(WorkTest, GrowsAsItsAnswerAndItsPrescribedWalksDo) {
         SCOPED_TRACE(std::to_string(interfaces) + " interfaces");
         setInterfaces(interfaces);
         const std::uint64_t before = ZR::Instrumentation::nodeVisits();
-        const Host::Answer answer = run(host_, forTheLastOf(interfaces, GetParam()));
+        const Host::Response response = run(host_, forTheLastOf(interfaces, GetParam()));
         const std::uint64_t visits = ZR::Instrumentation::nodeVisits() - before;
-        EXPECT_EQ(answer.paths.size() + answer.instances.size(), expected->objects.at(interfaces));
+        EXPECT_EQ(response.paths.size() + response.instances.size(),
+                  expected->objects.at(interfaces));
         EXPECT_EQ(visits, expected->visits.at(interfaces));
         EXPECT_EQ(host_.counted().calls(), expected->calls.at(interfaces));
     }

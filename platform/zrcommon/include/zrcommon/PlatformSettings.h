@@ -9,9 +9,10 @@
 namespace ZR {
 
 /// The settings of the platform: read once per process from the file that the
-/// environment variable ZR_CONFIG names, else from /etc/zr/platform.conf; a
-/// setting KEY is overridden by the environment variable ZR_KEY.
+/// environment variable ZR_CONFIG names, else from the default file; a setting KEY is overridden by
+/// the environment variable ZR_KEY.
 struct PlatformSettings {
+    static constexpr const char* defaultFile = "/etc/zr/platform.conf";
     static constexpr int defaultLevel = LogLevel::failure;
 
     /// The product's own: no shell and no network script reads what lies there.

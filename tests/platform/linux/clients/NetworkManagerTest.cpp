@@ -14,53 +14,86 @@ using testing::IsEmpty;
 
 constexpr const char* uuid = "11111111-2222-4333-8444-555555555555";
 
-NetworkManagerDevice device(std::int64_t expires) {
-    return {.managed = true,
-            .profile = uuid,
-            .dhcp4 = true,
-            .dhcp6 = true,
-            .address4 = "198.51.100.109"_ip,
-            .server4 = "198.51.100.1"_ip,
-            .expires4 = expires};
+NetworkManagerDevice deviceOf(const std::string& file) {
+    NetworkManagerDevice device = parseNetworkManagerDevice(sample(file));
+    EXPECT_TRUE(device.managed) << file;
+    EXPECT_EQ(device.profile, uuid) << file;
+    return device;
+}
+/// What two of three captured leases have in common.
+Lease lease(std::int64_t expires) {
+    return {.client = Client::NetworkManager,
+            .interfaceName = {},
+            .address = "198.51.100.109"_ip,
+            .server = "198.51.100.1"_ip,
+            .expires = expires,
+            .obtained = expires - 600,
+            .options = {1, 3, 6, 12, 15, 28, 42, 51, 54},
+            .clientIdentifier = "01:52:54:00:00:00:04"};
+}
+Lease lease6() {
+    return {.client = Client::NetworkManager,
+            .interfaceName = {},
+            .address = "2001:db8:99::107"_ip,
+            .server = {},
+            .expires = {},
+            .options = {1, 3, 23, 39},
+            .clientIdentifier = "00:04:ab:79:95:e2:7b:c5:ed:03:f1:18:2c:18:58:df:32:05"};
 }
 
 TEST(NetworkManagerDevice, CapturedByVersion142) {
-    EXPECT_EQ(parseNetworkManagerDevice(
-                  sample("networkmanager-internal/run-NetworkManager-devices-2.txt")),
-              device(1'795'216'616));
+    const auto device = deviceOf("networkmanager-internal/run-NetworkManager-devices-2.txt");
+    EXPECT_EQ(networkManagerLease4(device.options4), lease(1'795'216'616));
+    EXPECT_EQ(networkManagerLease6(device.options6), lease6());
 }
 
 TEST(NetworkManagerDevice, CapturedByVersion152) {
-    NetworkManagerDevice expected = device(1'795'217'223);
-    expected.address4 = "198.51.100.112"_ip;
-    EXPECT_EQ(parseNetworkManagerDevice(
-                  sample("networkmanager-1.52-internal/run-NetworkManager-devices-2.txt")),
-              expected);
+    const auto device = deviceOf("networkmanager-1.52-internal/run-NetworkManager-devices-2.txt");
+    const auto found = networkManagerLease4(device.options4);
+    ASSERT_TRUE(found);
+    EXPECT_EQ(found->address, "198.51.100.112"_ip);
+    EXPECT_EQ(found->expires, 1'795'217'223);
+    EXPECT_EQ(found->obtained, 1'795'216'623);
+    EXPECT_TRUE(networkManagerLease6(device.options6));
 }
 
 TEST(NetworkManagerDevice, CapturedWithDhclientBehindIt) {
-    EXPECT_EQ(parseNetworkManagerDevice(
-                  sample("networkmanager-dhclient/run-NetworkManager-devices-2.txt")),
-              device(1'795'216'696));
+    const auto device = deviceOf("networkmanager-dhclient/run-NetworkManager-devices-2.txt");
+    Lease expected = lease(1'795'216'696);
+    expected.renews = 1'795'216'396;
+    expected.rebinds = 1'795'216'621;
+    expected.options = {1, 3, 6, 12, 15, 28, 42, 51, 53, 54, 58, 59};
+    expected.clientIdentifier = "";
+    EXPECT_EQ(networkManagerLease4(device.options4), expected);
+    expected = lease6();
+    expected.address = "2001:db8:99::1b0"_ip;
+    expected.expires = 1'795'216'697;
+    expected.obtained = 1'795'216'097;
+    expected.renews = 1'795'216'397;
+    expected.rebinds = 1'795'216'622;
+    expected.options = {1, 2, 3, 13, 23, 39};
+    EXPECT_EQ(networkManagerLease6(device.options6), expected);
 }
 
 TEST(NetworkManagerDevice, CapturedInfiniteLeaseHasNoExpiry) {
-    EXPECT_EQ(parseNetworkManagerDevice(
-                  sample("networkmanager-internal/run-NetworkManager-devices-2.infinite.txt")),
-              device(Lease::never));
+    const auto device =
+        deviceOf("networkmanager-internal/run-NetworkManager-devices-2.infinite.txt");
+    Lease expected = lease(Lease::never);
+    expected.obtained = std::nullopt;
+    EXPECT_EQ(networkManagerLease4(device.options4), expected);
 }
 
 TEST(NetworkManagerDevice, WithoutASectionThereIsNoLease) {
-    EXPECT_EQ(
-        parseNetworkManagerDevice("[device]\nmanaged=true\n"),
-        (NetworkManagerDevice{.managed = true, .profile = "", .address4 = {}, .server4 = {}}));
-    EXPECT_EQ(parseNetworkManagerDevice(""),
-              (NetworkManagerDevice{.profile = "", .address4 = {}, .server4 = {}}));
+    EXPECT_EQ(parseNetworkManagerDevice("[device]\nmanaged=true\n"),
+              (NetworkManagerDevice{.managed = true, .profile = ""}));
+    EXPECT_EQ(parseNetworkManagerDevice(""), (NetworkManagerDevice{.profile = ""}));
     EXPECT_FALSE(parseNetworkManagerDevice("[device]\nmanaged=unknown\n").managed);
+    EXPECT_EQ(networkManagerLease4({}), std::nullopt);
+    EXPECT_EQ(networkManagerLease6({{"fqdn_fqdn", "vm"}}), std::nullopt);
 }
 
 TEST(NetworkManagerDevice, ATimeThatCannotBeReadIsOver) {
-    EXPECT_EQ(parseNetworkManagerDevice("[dhcp4]\ndhcp4.expiry=soon\n").expires4, 0);
+    EXPECT_EQ(networkManagerLease4({{"ip_address", "192.0.2.7"}, {"expiry", "soon"}})->expires, 0);
 }
 
 TEST(NetworkManagerProfile, Captured) {
@@ -129,15 +162,16 @@ TEST_F(NetworkManagerTest, OnAMachineWithoutItThereIsNothing) {
 TEST_F(NetworkManagerTest, CapturedStateWhileItRuns) {
     root_.write(state, sample("networkmanager-internal/run-NetworkManager-devices-2.txt"));
     root_.write(profile, sample("networkmanager-internal/eth1.nmconnection"));
+    root_.age(profile, 1'000);
     const ClientFacts facts = read();
-    EXPECT_THAT(facts.leases, ElementsAre(Lease{.client = Client::NetworkManager,
-                                                .interfaceName = {},
-                                                .ifindex = 2,
-                                                .address = "198.51.100.109"_ip,
-                                                .server = "198.51.100.1"_ip,
-                                                .clientAlive = true,
-                                                .expires = 1'795'216'616,
-                                                .origin = root_.path(state)}));
+    std::vector<Lease> expectedLeases{lease(1'795'216'616), lease6()};
+    for (Lease& each : expectedLeases) {
+        each.ifindex = 2;
+        each.clientAlive = true;
+        each.pid = 7;
+        each.origin = root_.path(state);
+    }
+    EXPECT_EQ(facts.leases, expectedLeases);
     LinkConfiguration expected{.client = Client::NetworkManager,
                                .ifindex = 2,
                                .dhcp4 = true,
@@ -155,8 +189,25 @@ TEST_F(NetworkManagerTest, WhatItLeftBehindManagesNothing) {
     root_.write(state, sample("networkmanager-internal/run-NetworkManager-devices-2.txt"));
     const ClientFacts facts = read({});
     EXPECT_THAT(facts.managements, IsEmpty());
-    ASSERT_EQ(facts.leases.size(), 1U);
+    ASSERT_EQ(facts.leases.size(), 2U);
     EXPECT_FALSE(facts.leases[0].clientAlive);
+    EXPECT_FALSE(facts.leases[1].clientAlive);
+}
+
+TEST_F(NetworkManagerTest, AProfileEditedSinceItWasAppliedSaysNothing) {
+    writeProfile("method=auto");
+    writeDevice();
+    root_.age(profile, 2'000);
+    root_.age(state, 2'000);
+    EXPECT_EQ(read().managements.at(0).dhcp4, true);
+    root_.age(profile, 3'000);
+    EXPECT_EQ(read().managements.at(0).dhcp4, std::nullopt);
+}
+
+TEST_F(NetworkManagerTest, DhcpV6MayHaveGivenOtherThingsThanAnAddress) {
+    writeDevice("[dhcp6]\ndhcp6.dhcp6_name_servers=2001:db8::53\n");
+    EXPECT_EQ(read().managements.at(0).dhcp6, std::nullopt);
+    EXPECT_THAT(read().leases, IsEmpty());
 }
 
 TEST_F(NetworkManagerTest, WhereItRunsForOtherLinksItsIndexesAreTheirs) {
@@ -176,8 +227,8 @@ TEST_F(NetworkManagerTest, WithoutItsProfileALeaseTellsOfDhcpAndNoLeaseOfNothing
 
 TEST_F(NetworkManagerTest, TheMethodOfTheActiveProfileTells) {
     const auto management = [&](const std::string& method) {
-        writeDevice();
         writeProfile("method=" + method + "\naddress1=192.0.2.1/24");
+        writeDevice();
         LinkConfiguration found = read().managements.at(0);
         EXPECT_THAT(found.staticAddresses, ElementsAre("192.0.2.1"_ip)) << method;
         return found;

@@ -19,32 +19,62 @@ using testing::ElementsAre;
 using Testing::inChild;
 using testing::IsEmpty;
 
-std::vector<NetworkdAddress> parse(const std::string& json) {
+NetworkdDescription describe(const std::string& json) {
     const auto parsed = parseNetworkdDescription(json);
-    const auto* const facts = std::get_if<std::vector<NetworkdAddress>>(&parsed);
+    const auto* const facts = std::get_if<NetworkdDescription>(&parsed);
     EXPECT_NE(facts, nullptr) << std::get<std::string_view>(parsed);
-    return facts == nullptr ? std::vector<NetworkdAddress>{} : *facts;
+    return facts == nullptr ? NetworkdDescription{} : *facts;
+}
+std::vector<NetworkdAddress> parse(const std::string& json) {
+    return describe(json).addresses;
 }
 
 NetworkdAddress address(const IpAddress& own, const std::string& source,
-                        const std::optional<IpAddress>& provider = {}, std::uint32_t ifindex = 2) {
-    return {.ifindex = ifindex, .address = own, .source = source, .provider = provider};
+                        const std::optional<IpAddress>& provider = {}, std::uint32_t ifindex = 2,
+                        std::optional<std::uint64_t> validUntil = {}) {
+    return {.ifindex = ifindex,
+            .address = own,
+            .source = source,
+            .provider = provider,
+            .validUntil = validUntil};
 }
+
+constexpr std::int64_t second = 1'000'000;
+// When the captured ones would have started, for the tests of their times.
+constexpr std::int64_t systemStart = 1'795'213'000 * second;
 
 TEST(NetworkdDescription, CapturedByVersion252) {
     EXPECT_THAT(
         parse(sample("networkd/networkctl-status-eth1.json")),
         ElementsAre(address("fe80::5054:ff:fe00:5"_ip, "foreign"),
-                    address("198.51.100.110"_ip, "DHCPv4", "198.51.100.1"_ip),
-                    address("2001:db8:99::1b2"_ip, "DHCPv6", "fe80::e0cb:10ff:feee:2799"_ip)));
+                    address("198.51.100.110"_ip, "DHCPv4", "198.51.100.1"_ip, 2, 2'790'836'929),
+                    address("2001:db8:99::1b2"_ip, "DHCPv6", "fe80::e0cb:10ff:feee:2799"_ip, 2,
+                            2'791'576'175)));
+    EXPECT_THAT(describe(sample("networkd/networkctl-status-eth1.json")).clients, IsEmpty());
 }
 
 TEST(NetworkdDescription, CapturedByVersion257) {
     EXPECT_THAT(
         parse(sample("networkd-257/networkctl-status-eth1.json")),
-        ElementsAre(address("2001:db8:99::1d3"_ip, "DHCPv6", "fe80::e0cb:10ff:feee:2799"_ip),
+        ElementsAre(address("2001:db8:99::1d3"_ip, "DHCPv6", "fe80::e0cb:10ff:feee:2799"_ip, 2,
+                            3'420'984'167),
                     address("fe80::5054:ff:fe00:6"_ip, "foreign"),
-                    address("198.51.100.111"_ip, "DHCPv4", "198.51.100.1"_ip)));
+                    address("198.51.100.111"_ip, "DHCPv4", "198.51.100.1"_ip, 2, 3'420'508'813)));
+    EXPECT_THAT(
+        describe(sample("networkd-257/networkctl-status-eth1.json")).clients,
+        ElementsAre(NetworkdClient{.ifindex = 2,
+                                   .ipv6 = false,
+                                   .obtained = 2'820'494'812,
+                                   .renews = 3'120'494'812,
+                                   .rebinds = 3'345'494'812,
+                                   .identifier =
+                                       "ff:92:5a:88:c4:00:02:00:00:ab:11:6c:5d:f1:5f:b1:ef:e9:f3"},
+                    NetworkdClient{.ifindex = 2,
+                                   .ipv6 = true,
+                                   .obtained = 2'820'491'305,
+                                   .renews = 3'120'491'305,
+                                   .rebinds = 3'345'491'305,
+                                   .identifier = "00:02:00:00:ab:11:6c:5d:f1:5f:b1:ef:e9:f3"}));
 }
 
 TEST(NetworkdDescription, CapturedStaticAndLinkLocal) {
@@ -91,16 +121,23 @@ TEST(AddNetworkdDescription, AddsLeasesThatTheFilesDoNotTell) {
                      .server = "198.51.100.1"_ip,
                      .expires = {},
                      .origin = "the file"}};
-    const std::vector<Lease> expected{facts.leases[0],
+    facts.managers = {{.client = Client::Networkd, .pid = 7}};
+    Lease known = facts.leases[0];
+    known.clientAlive = true;
+    known.pid = 7;
+    known.expires = 1'795'215'791;  // which the file does not tell
+    const std::vector<Lease> expected{known,
                                       {.client = Client::Networkd,
                                        .interfaceName = {},
                                        .ifindex = 2,
                                        .address = "2001:db8:99::1b2"_ip,
                                        .server = "fe80::e0cb:10ff:feee:2799"_ip,
                                        .clientAlive = true,
-                                       .expires = {},
+                                       .expires = 1'795'215'792,
+                                       .pid = 7,
                                        .origin = "D-Bus org.freedesktop.network1"}};
-    addNetworkdDescription(parse(sample("networkd/networkctl-status-eth1.json")), facts);
+    addNetworkdDescription(describe(sample("networkd/networkctl-status-eth1.json")), systemStart,
+                           facts);
     EXPECT_EQ(facts.leases, expected);
 }
 
@@ -111,11 +148,33 @@ TEST(AddNetworkdDescription, AddsAddressesThatAreStaticOnce) {
                           .dhcp4 = false,
                           .dhcp6 = false,
                           .staticAddresses = {}}};
-    const auto described = parse(sample("networkd/networkctl-static-linklocal.json"));
-    addNetworkdDescription(described, facts);
-    addNetworkdDescription(described, facts);
+    const auto described = describe(sample("networkd/networkctl-static-linklocal.json"));
+    addNetworkdDescription(described, systemStart, facts);
+    addNetworkdDescription(described, systemStart, facts);
     EXPECT_THAT(facts.managements[0].staticAddresses, ElementsAre("198.51.100.30"_ip));
     EXPECT_THAT(facts.leases, IsEmpty());
+}
+
+TEST(AddNetworkdDescription, Version257TellsTheTimesOfItsClients) {
+    ClientFacts facts;
+    facts.managements = {{.client = Client::Networkd,
+                          .ifindex = 2,
+                          .dhcp4 = {},
+                          .dhcp6 = {},
+                          .staticAddresses = {}}};
+    addNetworkdDescription(describe(sample("networkd-257/networkctl-status-eth1.json")),
+                           systemStart, facts);
+    ASSERT_EQ(facts.leases.size(), 2U);
+    for (const Lease& lease : facts.leases) {
+        EXPECT_THAT(lease.obtained, testing::AnyOf(1'795'215'820, 1'795'215'821));
+        EXPECT_EQ(*lease.renews - *lease.obtained, 300);
+        EXPECT_EQ(*lease.rebinds - *lease.obtained, 525);
+        EXPECT_THAT(*lease.expires - *lease.obtained, testing::AnyOf(600, 601));
+    }
+    EXPECT_EQ(facts.leases[0].clientIdentifier, "00:02:00:00:ab:11:6c:5d:f1:5f:b1:ef:e9:f3");
+    // Whatever its file says by now.
+    EXPECT_EQ(facts.managements[0].dhcp4, true);
+    EXPECT_EQ(facts.managements[0].dhcp6, true);
 }
 
 /// The response of a machine whose system bus is at an address; in a process of its own,
@@ -124,7 +183,7 @@ std::string responseOf(const std::string& bus, std::chrono::milliseconds time) {
     const auto result = inChild([&] {
         ::setenv("DBUS_SYSTEM_BUS_ADDRESS", bus.c_str(), 1);
         const auto start = std::chrono::steady_clock::now();
-        const NetworkdResponse response = askNetworkd(start + time);
+        const BusResponse response = askNetworkd(start + time);
         const bool late = std::chrono::steady_clock::now() - start > std::chrono::seconds{5};
         return response.json + '|' + response.reason + (late ? " (late)" : "");
     });

@@ -34,20 +34,22 @@ TEST(NetworkdLink, OnlyLinksThatItConfiguresAreItsOwn) {
 
 class NetworkdTest : public testing::Test {
   protected:
-    ClientFacts read() const {
-        ClientFacts facts;
-        readNetworkd({.files = root_.path()}, facts);
+    ClientFacts read(ClientFacts facts = running(Client::Networkd)) const {
+        facts = readWith(readNetworkd, root_, std::move(facts));
+        facts.managers.clear();
         return facts;
     }
     void link(const std::string& index, const std::string& text) const {
+        // It is written once the files of its configuration are applied.
         root_.write("/run/systemd/netif/links/" + index, text);
+        root_.age("/run/systemd/netif/links/" + index, 4'000'000'000);
     }
 
     TemporaryDirectory root_;
 };
 
 TEST_F(NetworkdTest, OnAMachineWithoutItThereIsNothing) {
-    EXPECT_EQ(read(), ClientFacts{});
+    EXPECT_EQ(read({}), ClientFacts{});
 }
 
 TEST_F(NetworkdTest, AsItWasCaptured) {
@@ -72,6 +74,9 @@ TEST_F(NetworkdTest, AsItWasCaptured) {
                                    .server = "198.51.100.1"_ip,
                                    .clientAlive = true,
                                    .expires = std::nullopt,
+                                   .options = {1, 3, 54, 28, 51, 6, 42, 15, 12},
+                                   .clientIdentifier = "fffea6fdf300020000ab1162026949ec04e8a7",
+                                   .pid = 7,
                                    .origin = root_.path("/run/systemd/netif/leases/2")}}));
     EXPECT_THAT(ZR::Testing::textsOf(facts.diagnostics), IsEmpty());
 }
@@ -84,6 +89,56 @@ TEST_F(NetworkdTest, WhereItRunsForOtherLinksItsIndexesAreTheirs) {
     EXPECT_THAT(facts.managements, IsEmpty());
     EXPECT_THAT(facts.leases, IsEmpty());
     EXPECT_EQ(readWith(readNetworkd, root_, running(Client::Networkd)).leases.size(), 1U);
+}
+
+TEST_F(NetworkdTest, WhatOneThatWasKilledLeftIsNoFactAboutNow) {
+    link("2", sample("networkd/run-systemd-netif-links-2.txt"));
+    root_.write("/run/systemd/netif/leases/2", sample("networkd/run-systemd-netif-leases-2.txt"));
+    root_.write("/etc/systemd/network/10-eth1.network", sample("networkd/10-eth1.network"));
+    const ClientFacts facts = read({});
+    EXPECT_THAT(facts.managements, IsEmpty());
+    ASSERT_EQ(facts.configurations.size(), 1U);
+    EXPECT_EQ(facts.configurations[0].dhcp4, true);
+    ASSERT_EQ(facts.leases.size(), 1U);
+    EXPECT_FALSE(facts.leases[0].clientAlive);
+}
+
+TEST_F(NetworkdTest, AFileEditedSinceTheLinkWasConfiguredIsNotApplied) {
+    const std::string state = "/run/systemd/netif/links/2";
+    const std::string file = "/etc/systemd/network/a.network";
+    link("2", "ADMIN_STATE=configured\nNETWORK_FILE=" + file + "\n");
+    root_.write(file, "[Network]\nDHCP=yes\n");
+    root_.age(state, 2'000);
+    root_.age(file, 2'000);
+    EXPECT_EQ(read().managements.at(0).dhcp4, true);
+    root_.age(file, 3'000);
+    EXPECT_EQ(read().managements.at(0).dhcp4, std::nullopt);
+    root_.age(file, 1'000);
+    root_.write(file + ".d/10.conf", "[Network]\nDHCP=no\n");
+    root_.age(file + ".d/10.conf", 3'000);
+    EXPECT_EQ(read().managements.at(0).dhcp4, std::nullopt);
+}
+
+TEST_F(NetworkdTest, DamagedFilesAreToldAndTheRestCounts) {
+    link("2", "ADMIN_STATE=configured\nscrap\nNETWORK_FILE=\n");
+    link("3", "OPER_STATE=routable\n");
+    root_.write("/run/systemd/netif/leases/2",
+                "# private\nADDRESS=198.51.100.110\nLIFETIME=soon\n\x01\x02\n");
+    root_.write("/run/systemd/netif/leases/3", "");
+    const ClientFacts facts = read();
+    EXPECT_EQ(facts.managements.size(), 1U);
+    EXPECT_EQ(facts.leases.size(), 1U);
+    const auto told = [&](const std::string& file, const std::string& reason) {
+        return "cannot use all of " + root_.path("/run/systemd/netif/" + file) + ": " + reason;
+    };
+    EXPECT_THAT(ZR::Testing::textsOf(facts.diagnostics),
+                testing::ElementsAre(told("links/2", "line 2: not of the form KEY=value"),
+                                     told("links/3", "no ADMIN_STATE"),
+                                     told("leases/2", "line 3: LIFETIME is not a time"),
+                                     told("leases/3", "no ADDRESS")));
+    for (const Diagnostic& diagnostic : facts.diagnostics) {
+        EXPECT_EQ(diagnostic.kind, Diagnostic::Kind::Damaged);
+    }
 }
 
 TEST_F(NetworkdTest, AnInfiniteLeaseNeverEnds) {

@@ -7,6 +7,7 @@
 #include <grp.h>
 #include <gtest/gtest.h>
 #include <linux/capability.h>
+#include <net/if.h>
 #include <sys/prctl.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -335,6 +336,11 @@ TEST_F(ProcessesTest, DhcpcdKeepsItsRightsInAnotherProcess) {
     EXPECT_EQ(facts.processes[0].pid, 20);
     EXPECT_EQ(facts.processes[0].user, 102U);
     EXPECT_THAT(ZR::Testing::textsOf(facts.diagnostics), IsEmpty());
+    // So does a further one that has not taken its own title yet.
+    add("22", "dhcpcd", "dhcpcd: eth1 [ip4] [ip6]");
+    proc_.write("/22/status", status('S', 102, 102, 0, 20));
+    EXPECT_EQ(read().processes.size(), 2U);
+    std::filesystem::remove_all(proc_.path("/22"));
     // Another one of root has nothing to do with it.
     proc_.write("/21/status", status('S', 0, 0, 0, 1));
     EXPECT_THAT(read().processes, IsEmpty());
@@ -457,6 +463,56 @@ TEST(ForgedProcesses, OfARealKernel) {
             "--ambient-caps +net_raw PROGRAM"};
         EXPECT_EQ(clientsFound(), 1U);
     }));
+}
+
+/// The client that asks in vain on eth1, once it hears that link; none after some seconds.
+std::optional<ClientProcess> askingClient(std::uint32_t ifindex) {
+    for (int i = 0; i < 1000; ++i) {
+        ClientFacts facts;
+        readProcesses({}, facts);
+        if (facts.diagnostics.empty() && facts.processes.size() == 1 &&
+            facts.processes[0].heardLinks &&
+            *facts.processes[0].heardLinks == std::vector{ifindex}) {
+            return facts.processes[0];
+        }
+        ::usleep(10'000);
+    }
+    return std::nullopt;
+}
+
+void expectHeard(const char* program, const std::string& command) {
+    if (::access(program, X_OK) != 0) {
+        GTEST_SKIP() << "needs " << program;
+    }
+    EXPECT_TRUE(passesInNamespaces(60, [&] {
+        run("mkdir -p /var/lib/dhcp /var/lib/dhcpcd && ip link add eth1 type veth peer name far && "
+            "ip link set far up && ip link set eth1 up");
+        const std::uint32_t ifindex = ::if_nametoindex("eth1");
+        run(command + " </dev/null >/dev/null 2>&1 &");
+        const auto client = askingClient(ifindex);
+        ASSERT_TRUE(client) << command;
+        EXPECT_EQ(client->interfaces, std::vector{"eth1"_name});
+        if (client->client == Client::Dhclient) {
+            run("ip link set eth1 name lan0");
+            EXPECT_TRUE(askingClient(ifindex)) << "a link keeps its index";
+        }
+    }));
+}
+
+TEST(RealProcesses, DhclientIsHeardOnItsLink) {
+    ZR_NEEDS_NAMESPACES();
+    expectHeard("/usr/sbin/dhclient", "/usr/sbin/dhclient -d -sf /bin/true eth1");
+}
+
+TEST(RealProcesses, DhcpcdIsHeardOnItsLinkByAProcessOfItsOwn) {
+    ZR_NEEDS_NAMESPACES();
+    expectHeard("/usr/sbin/dhcpcd", "/usr/sbin/dhcpcd -B -4 -c /bin/true eth1");
+}
+
+TEST(RealProcesses, UdhcpcIsHeardOnItsLink) {
+    ZR_NEEDS_NAMESPACES();
+    // It listens only for a while after each of its requests.
+    expectHeard("/usr/sbin/udhcpc", "/usr/sbin/udhcpc -f -s /bin/true -i eth1");
 }
 
 TEST(HiddenProcesses, OfARealKernel) {

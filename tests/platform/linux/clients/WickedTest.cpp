@@ -35,6 +35,8 @@ constexpr const char* lease4 = R"(<?xml version="1.0"?>
     <relay-address>198.51.100.2</relay-address>
     <lease-time>600</lease-time>
     <renewal-time>300</renewal-time>
+    <rebind-time>525</rebind-time>
+    <client-id>01:52:54:00:00:00:04</client-id>
     <address>198.51.100.7</address>
     <netmask>255.255.255.0</netmask>
   </ipv4:dhcp>
@@ -52,6 +54,8 @@ constexpr const char* lease6 = R"(<lease>
     <ia-na>
       <interface-id>1</interface-id>
       <acquired>1000050</acquired>
+      <renewal-time>200</renewal-time>
+      <rebind-time>400</rebind-time>
       <ia-addr>
         <address>2001:db8::7</address>
         <preferred-lft>300</preferred-lft>
@@ -72,25 +76,28 @@ WickedLease parse(const std::string& xml) {
 }
 
 TEST(WickedLease, OfIPv4) {
-    EXPECT_EQ(
-        parse(lease4),
-        (WickedLease{.family = AF_INET,
-                     .type = "dhcp",
-                     .state = "granted",
-                     .server = "198.51.100.1"_ip,
-                     .addresses = {
-                         {.address = "198.51.100.7"_ip, .acquired = 1'000'000, .lifetime = 600}}}));
+    EXPECT_EQ(parse(lease4), (WickedLease{.family = AF_INET,
+                                          .type = "dhcp",
+                                          .state = "granted",
+                                          .server = "198.51.100.1"_ip,
+                                          .addresses = {{.address = "198.51.100.7"_ip,
+                                                         .acquired = 1'000'000,
+                                                         .lifetime = 600,
+                                                         .renewal = 300,
+                                                         .rebinding = 525}},
+                                          .clientIdentifier = "01:52:54:00:00:00:04"}));
 }
 
 TEST(WickedLease, OfIPv6NamesTheSenderOfTheServersMessages) {
-    EXPECT_EQ(
-        parse(lease6),
-        (WickedLease{
-            .family = AF_INET6,
-            .type = "dhcp",
-            .state = "granted",
-            .server = "fe80::1"_ip,
-            .addresses = {{.address = "2001:db8::7"_ip, .acquired = 1'000'050, .lifetime = 600}}}));
+    EXPECT_EQ(parse(lease6), (WickedLease{.family = AF_INET6,
+                                          .type = "dhcp",
+                                          .state = "granted",
+                                          .server = "fe80::1"_ip,
+                                          .addresses = {{.address = "2001:db8::7"_ip,
+                                                         .acquired = 1'000'050,
+                                                         .lifetime = 600,
+                                                         .renewal = 200,
+                                                         .rebinding = 400}}}));
 }
 
 TEST(WickedLease, EveryBeginningIsTornOrEmpty) {
@@ -135,9 +142,14 @@ TEST_F(WickedTest, ALeaseIsTheFilesInterfacesOwn) {
                    .address = "198.51.100.7"_ip,
                    .server = "198.51.100.1"_ip,
                    .expires = 1'000'600,
+                   .obtained = 1'000'000,
+                   .renews = 1'000'300,
+                   .rebinds = 1'000'525,
+                   .clientIdentifier = "01:52:54:00:00:00:04",
                    .origin = root_.path(file)};
     EXPECT_THAT(read().leases, ElementsAre(expected));
     expected.clientAlive = true;
+    expected.pid = 7;
     EXPECT_THAT(read(running(Client::Wicked)).leases, ElementsAre(expected));
 }
 
@@ -149,6 +161,9 @@ TEST_F(WickedTest, BothPlacesAndProtocolsAreRead) {
                                   .address = "2001:db8::7"_ip,
                                   .server = "fe80::1"_ip,
                                   .expires = 1'000'650,
+                                  .obtained = 1'000'050,
+                                  .renews = 1'000'250,
+                                  .rebinds = 1'000'450,
                                   .origin = root_.path("/run/wicked/lease-a-b-dhcp-ipv6.xml")}));
 }
 

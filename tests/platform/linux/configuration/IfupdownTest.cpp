@@ -2,6 +2,7 @@
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <sys/stat.h>
 
 #include "LinuxSupport.h"
 
@@ -105,8 +106,24 @@ TEST_F(IfupdownTest, EachMethodHasItsMeaning) {
 TEST_F(IfupdownTest, AnInterfaceThatIsUpMayHaveAnotherLogicalName) {
     write("iface home inet dhcp\niface eth2 inet dhcp\n");
     root_.write("/run/network/ifstate", "eth1=home\n");
-    EXPECT_THAT(read().configurations,
-                ElementsAre(configuration("eth1", true), configuration("eth2", true)));
+    LinkConfiguration up = configuration("eth1", true);
+    up.applied = true;
+    EXPECT_THAT(read().configurations, ElementsAre(up, configuration("eth2", true)));
+}
+
+TEST_F(IfupdownTest, AConfigurationIsAppliedFromIfupToIfdown) {
+    write("iface eth1 inet dhcp\n");
+    root_.write("/run/network/ifstate", "lo=lo\n");
+    EXPECT_THAT(read().configurations, ElementsAre(configuration("eth1", true)));
+    root_.write("/run/network/ifstate", "lo=lo\neth1=eth1\n");
+    LinkConfiguration up = configuration("eth1", true);
+    up.applied = true;
+    EXPECT_THAT(read().configurations, ElementsAre(up));
+    ASSERT_EQ(::chmod(root_.path("").c_str(), 0755), 0);
+    ASSERT_EQ(::chmod(root_.path("/run/network/ifstate").c_str(), 0666), 0);
+    EXPECT_THAT(read().configurations, ElementsAre(configuration("eth1", true)))
+        << "any user could have written that";
+    EXPECT_EQ(read().diagnostics.size(), 1U);
 }
 
 TEST_F(IfupdownTest, FurtherFilesAreReadAndWatched) {

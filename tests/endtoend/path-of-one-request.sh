@@ -3,7 +3,7 @@
 # it, line for line. Times, line numbers, addresses and the host's name are what
 # differs from run to run; they are replaced by T, N, ADDRESS and HOST.
 #
-# Usage: road-of-one-request.sh PATH-OF-cimdhcp EXPECTED
+# Usage: path-of-one-request.sh PATH-OF-cimdhcp EXPECTED
 set -euo pipefail
 
 program=$1

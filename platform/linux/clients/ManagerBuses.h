@@ -1,0 +1,48 @@
+#pragma once
+
+#include <array>
+#include <chrono>
+#include <functional>
+
+#include "clients/BusRequest.h"
+#include "clients/ConnmanBus.h"
+#include "clients/NetworkManagerBus.h"
+#include "clients/NetworkdBus.h"
+#include "facts/ClientFacts.h"
+
+namespace ZR::Live {
+
+/// Asks those managers over the system bus that run and can be asked there: they know more
+/// than their files tell. One that does not respond in time is left alone for a while, as
+/// each request to it would make a reading wait. One thread.
+class ManagerBuses {
+  public:
+    using Time = std::chrono::steady_clock::time_point;
+    using Ask = std::function<BusResponse(BusRequests::Deadline)>;
+
+    /// How each is asked; one without a way is not.
+    struct Ways {
+        Ask networkd = askNetworkd;
+        Ask networkManager = askNetworkManager;
+        Ask connman = askConnman;
+    };
+
+    explicit ManagerBuses(Ways ways);
+
+    /// Adds to the facts, which have those of the files already, what the managers say.
+    /// `now`: the time since the start of the system, by whatever clock.
+    void consult(ClientFacts& facts, Time now);
+
+  private:
+    struct Manager {
+        Client client{};
+        Ask ask;
+        /// Returns why the text cannot be used, empty when it can.
+        std::string_view (*add)(std::string_view json, ClientFacts& facts) = nullptr;
+        Time rest{};  ///< not to be asked before
+    };
+
+    std::array<Manager, 3> managers_;
+};
+
+}  // namespace ZR::Live

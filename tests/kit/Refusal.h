@@ -1,0 +1,25 @@
+#pragma once
+
+#include <gtest/gtest.h>
+
+#include <string>
+#include <utility>
+
+#include "text/Failure.h"
+
+namespace cimdhcp::test {
+
+/// The message of the Failure that a call ends with, which has the status given;
+/// "accepted" for a call that ends without one.
+template <typename Call>
+std::string refusalOf(Call&& call, ExitStatus status) {
+    try {
+        static_cast<void>(std::forward<Call>(call)());
+        return "accepted";
+    } catch (const Failure& failure) {
+        EXPECT_EQ(failure.status(), status);
+        return failure.what();
+    }
+}
+
+}  // namespace cimdhcp::test
