@@ -5,6 +5,7 @@
 #include <utility>
 #include <vector>
 
+#include "arguments/Commands.h"
 #include "arguments/PathArgument.h"
 #include "arguments/ValueReading.h"
 #include "cimom/ClassDeclaration.h"
@@ -43,6 +44,12 @@ Response noSuchProperty(const cimom::ClassDeclaration& declaration, const std::s
     return response;
 }
 
+template <typename Values>
+auto find(Values& values, const std::string& name) {
+    return std::find_if(values.begin(), values.end(),
+                        [&](const auto& each) { return cimom::sameName(each.name, name); });
+}
+
 bool isConfigurationName(const cimom::ClassDeclaration& declaration, std::string_view property) {
     return cimom::sameName(declaration.name, settingClass) &&
            cimom::sameName(property, nameProperty);
@@ -77,10 +84,7 @@ Assignments readAssignments(const ModifyCommand& command, const std::string& cla
     std::string unwritable;
     for (const std::string& assignment : command.assignments) {
         const auto [name, value] = splitAssignment(assignment);
-        const bool twice =
-            std::any_of(result.values.begin(), result.values.end(),
-                        [&](const auto& each) { return cimom::sameName(each.name, name); });
-        if (twice) {
+        if (find(result.values, name) != result.values.end()) {
             throw Failure(ExitStatus::usage, printable(name) + " is given twice");
         }
         if (declaration == nullptr) {
@@ -132,10 +136,18 @@ cimom::Instance get(const cimom::ObjectPath& path, Client& client) {
     throw Failure(ExitStatus::notDone, "the response to GetInstance has no instance");
 }
 
+cimom::Instance readBack(const cimom::ObjectPath& path, Client& client) {
+    try {
+        return get(path, client);
+    } catch (const Failure& failure) {
+        throw Failure(failure.status(),
+                      std::string(failure.what()) +
+                          "; what came of the change is not known, as it cannot be read back");
+    }
+}
+
 void put(cimom::Instance& instance, const cimom::NamedValue& value) {
-    const auto found =
-        std::find_if(instance.properties.begin(), instance.properties.end(),
-                     [&](const auto& each) { return cimom::sameName(each.name, value.name); });
+    const auto found = find(instance.properties, value.name);
     if (found == instance.properties.end()) {
         instance.properties.push_back(value);
     } else {
@@ -206,7 +218,7 @@ CimOperation carryOut(const ModifyCommand& command, Client& client) {
     }
     CimOperation operation{path, client.modify(instance, names)};
     if (operation.response.status.ok()) {
-        compare(assignments.values, before, get(path, client));
+        compare(assignments.values, before, readBack(path, client));
     }
     return operation;
 }

@@ -5,6 +5,7 @@
 #include <exception>
 #include <memory>
 #include <ostream>
+#include <type_traits>
 #include <variant>
 
 #include "arguments/CommandLine.h"
@@ -60,12 +61,11 @@ class Execution {
         service.settle(patience);
         const auto snapshot = service.current();
         outputs_.out << ZR::toJson(*snapshot, ZR::getSystemName());
-        for (const ZR::Diagnostic& diagnostic : snapshot->diagnostics()) {
-            outputs_.err << "cimdhcp: " << printable(diagnostic.text) << '\n';
-        }
+        tell(*snapshot);
     }
 
     void operator()(const ServeCommand& command) const {
+        tellOfTree();
         const auto client = openClient(line_.options);
         serve(command, client->manager(), outputs_.out);
     }
@@ -85,6 +85,9 @@ class Execution {
 
     template <typename ClientCommand>
     void operator()(const ClientCommand& /*command*/) const {
+        if constexpr (!std::is_same_v<ClientCommand, ShowCommand>) {
+            tellOfTree();  // "show" has it with what else it tells of the machine
+        }
         const auto client = openClient(line_.options);
         const Outcome outcome = carryOut(line_.command, *client, presentation_);
         outputs_.out << outcome.text;
@@ -95,6 +98,19 @@ class Execution {
     }
 
   private:
+    void tell(const ZR::Snapshot& snapshot) const {
+        for (const ZR::Diagnostic& diagnostic : snapshot.diagnostics()) {
+            outputs_.err << "cimdhcp: " << printable(diagnostic.text) << '\n';
+        }
+    }
+
+    /// Slips in a tree are its author's, who may run any command to see what comes of it.
+    void tellOfTree() const {
+        if (!treeName().empty()) {
+            tell(*ZR::InstrumentationService::process().current());
+        }
+    }
+
     const CommandLine& line_;
     const Presentation& presentation_;
     const Outputs& outputs_;

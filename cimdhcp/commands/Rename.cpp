@@ -121,6 +121,9 @@ void prepareFile(const RenameCommand& command, RenameReport& report) {
                                                    " has no configuration file: there is no " +
                                                    printable(report.file) + "; --create makes it");
         }
+        refuse(refusalsOfName(report.interfaceName),
+               "the file's first line would be DEVICE=" + printable(report.interfaceName) + ": ",
+               command);
         report.directoryCreated = createDataDirectory(report.dataDir);
         createConfigurationFile(report.file, report.interfaceName, command.name);
         report.fileCreated = true;
@@ -136,10 +139,35 @@ void prepareFile(const RenameCommand& command, RenameReport& report) {
     }
 }
 
+/// Lets the provider write the name, and reads it back.
+void change(const cimom::ObjectPath& path, const RenameReport& report, Client& client) {
+    const cimom::Instance wanted{path, {{nameProperty, cimom::Value::ofString(report.newName)}}};
+    const Response response = client.modify(wanted, {nameProperty});
+    if (!response.status.ok()) {
+        throw client.failure(response, path);
+    }
+    const std::string name = nameNow(path, client);
+    if (name == report.newName) {
+        return;
+    }
+    const std::string about = "the configuration name of " + printable(report.interfaceName);
+    if (name != report.oldName) {
+        throw Failure(ExitStatus::notDone, about + " is now \"" + printable(name) + '"');
+    }
+    throw Failure(ExitStatus::notDone,
+                  about + " is still \"" + printable(name) + "\": " +
+                      (report.file.empty()
+                           ? "that machine has no configuration file for it, or cannot write it"
+                           : printable(whyUnchanged(report.file))));
+}
+
 /// What is so after a failure, behind its message.
-std::string stateNow(const RenameReport& report) {
+std::string stateNow(const RenameReport& report, const Failure& failure) {
     if (report.file.empty()) {
-        return {};
+        // A server that does not respond may have carried the request out.
+        return failure.status() == ExitStatus::notLoaded
+                   ? "; whether the name was changed is not known"
+                   : "";
     }
     return "; " + std::string(report.fileCreated ? "made by this command, " : "") +
            printable(nameInFile(report.file));
@@ -179,23 +207,10 @@ RenameReport rename(const RenameCommand& command, Client& client) {
         prepareFile(command, report);
     }
 
-    const cimom::Instance wanted{setting.path,
-                                 {{nameProperty, cimom::Value::ofString(command.name)}}};
-    const Response response = client.modify(wanted, {nameProperty});
-    if (!response.status.ok()) {
-        const Failure failure = client.failure(response, setting.path);
-        throw Failure(failure.status(), failure.what() + stateNow(report));
-    }
-    const std::string name = nameNow(setting.path, client);
-    if (name != command.name) {
-        const bool still = name == report.oldName;
-        throw Failure(ExitStatus::notDone,
-                      "the configuration name of " + printable(report.interfaceName) +
-                          (still ? " is still \"" : " is now \"") + printable(name) + "\": " +
-                          (report.file.empty()
-                               ? "that machine has no configuration file for it, or cannot write it"
-                               : printable(whyUnchanged(report.file))) +
-                          stateNow(report));
+    try {
+        change(setting.path, report, client);
+    } catch (const Failure& failure) {
+        throw Failure(failure.status(), failure.what() + stateNow(report, failure));
     }
     return report;
 }

@@ -29,10 +29,11 @@ int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
                   "a tree survives being written");
     fuzz::require(*std::get<0>(again) == snapshot, "the tree that comes back is the same");
     const ZR::JsonTree named = ZR::parseJsonTree(text, "host", "name");
-    const auto& told = std::get<0>(named)->remarks();
+    const auto told = std::get<0>(named)->diagnostics();
     fuzz::require(ZR::toJson(*std::get<0>(named)) == json, "slips change nothing in a tree");
-    fuzz::require(std::all_of(told.begin(), told.end(),
-                              [](const std::string& each) { return each.starts_with("name:"); }),
-                  "slips are told under the name of the tree");
+    fuzz::require(
+        std::all_of(told.begin(), told.end(),
+                    [](const ZR::Diagnostic& each) { return each.text.starts_with("name:"); }),
+        "slips are told under the name of the tree");
     return 0;
 }

@@ -2,6 +2,11 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include "arguments/Commands.h"
+#include "cimom/ClassDeclaration.h"
+#include "client/ClassLookup.h"
+#include "client/Client.h"
+#include "client/MachineInterfaces.h"
 #include "commands/CimOperations.h"
 #include "text/Failure.h"
 
@@ -147,6 +152,20 @@ TEST(ModifyRequest, TellsWhatIsOtherThanWanted) {
     } shelf;
     EXPECT_EQ(refusal(shelf, {"Label=new", "Place=attic"}),
               "not changed as wanted: Label is now \"new\"; Place is now not set, not \"attic\"");
+}
+
+TEST(ModifyRequest, TellsThatTheChangeCannotBeReadBack) {
+    class Gone : public Shelf {
+      public:
+        Response modify(const cimom::Instance& changed,
+                        const std::vector<std::string>& properties) override {
+            Response response = Shelf::modify(changed, properties);
+            instance.path.keys.clear();
+            return response;
+        }
+    } shelf;
+    EXPECT_EQ(refusal(shelf, {"Label=new"}),
+              "status 6; what came of the change is not known, as it cannot be read back");
 }
 
 TEST(ModifyRequest, IsNotSentForWhatCannotBeWritten) {

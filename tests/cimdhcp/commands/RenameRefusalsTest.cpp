@@ -3,7 +3,6 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "kit/ChildProcess.h"
 #include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"
 
@@ -19,10 +18,11 @@ using testing::IsEmpty;
 std::vector<std::string> namesWithEveryCharacter() {
     std::vector<std::string> names{"", "office", "a:b", "b\xC3\xBCro", "#1", "a#b"};
     for (char letter = ' '; letter <= '~'; ++letter) {
-        const std::string one(1, letter);
-        for (const std::string& name :
-             {one, one + "a", "a" + one + "b", "a" + one, "a:" + one + "b", "a=" + one + "b",
-              one + "," + one + "}"}) {
+        for (const char* form : {"@", "@a", "a@b", "a@", "a:@b", "a=@b", "@,@}"}) {
+            std::string name;
+            for (const char sign : std::string_view(form)) {
+                name += sign == '@' ? letter : sign;
+            }
             names.push_back(name);
         }
     }
@@ -50,9 +50,9 @@ TEST(RenameRefusals, EveryNameThatIsTakenIsReadBackByShellsAsItself) {
     // One shell for all of them: a line each, and a name of its own.
     std::string lines;
     std::string expected;
-    for (std::size_t i = 0; i < taken.size(); ++i) {
-        lines += "CONFIG_NAME=" + taken[i] + "\nprintf '%s\\n' \"$CONFIG_NAME\"\n";
-        expected += taken[i] + "\n";
+    for (const std::string& name : taken) {
+        lines.append("CONFIG_NAME=").append(name).append("\nprintf '%s\\n' \"$CONFIG_NAME\"\n");
+        expected.append(name).append("\n");
     }
     const ZR::Testing::TemporaryDirectory directory;
     ZR::Testing::writeFile(directory / "lines", lines);

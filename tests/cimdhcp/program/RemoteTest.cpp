@@ -298,10 +298,11 @@ TEST_F(Remote, AnInstanceIsModified) {
     EXPECT_EQ(ZR::Testing::readFile(configuration("eth0")), "DEVICE=eth0\nCONFIG_NAME=a <b> & c\n");
     EXPECT_EQ(
         ask({"rename", "eth0", "office"}),
-        (Ended{0, "eth0: the configuration name is now \"office\", was \"a <b> & c\".\n",
-               "cimdhcp: the configuration file on that machine could not be looked at first: lines "
-               "that only contain CONFIG_NAME were replaced, too, and a last line without an end "
-               "was written on, if there were any\n"}));
+        (Ended{
+            0, "eth0: the configuration name is now \"office\", was \"a <b> & c\".\n",
+            "cimdhcp: the configuration file on that machine could not be looked at first: lines "
+            "that only contain CONFIG_NAME were replaced, too, and a last line without an end "
+            "was written on, if there were any\n"}));
     EXPECT_EQ(ask({"rename", "eth0", "the office"}).status, 1) << "the name can be looked at";
     EXPECT_EQ(ask({"modify", setting, "ConfigurationName=office"}).err,
               "cimdhcp: not changed: ConfigurationName is \"office\" already\n");

@@ -103,6 +103,17 @@ TEST_F(Rename, TellsInJsonWhatItDid) {
                                                                                         ""}));
 }
 
+TEST_F(Rename, MakesNoFileForAnInterfaceThatAShellWouldReadOtherwise) {
+    setTree(test::computer("Computer", test::dhcpInterface("a;b", "192.0.2.1")));
+    const Ended refused = run({"rename", "a;b", "office", "--create"});
+    EXPECT_EQ(refused.status, 1);
+    EXPECT_THAT(refused.err, HasSubstr("the file's first line would be DEVICE=a;b: the name has "
+                                       "a \";\": "));
+    EXPECT_TRUE(fs::is_empty(dataDir()));
+    EXPECT_EQ(run({"rename", "a;b", "office", "--create", "--force"}).status, 0);
+    EXPECT_EQ(nameOf("a;b"), "DEVICE=a;b\nCONFIG_NAME=office\n");
+}
+
 TEST_F(Rename, NamesTheInterfacesThatThereAre) {
     EXPECT_EQ(
         run({"rename", "eth7", "office"}),

@@ -4,7 +4,6 @@
 #include <array>
 #include <cstdint>
 #include <nlohmann/json.hpp>
-#include <set>
 #include <utility>
 #include <vector>
 
@@ -18,8 +17,6 @@ namespace {
 using Json = nlohmann::json;
 
 constexpr unsigned deepest = 64;
-
-constexpr std::string_view hostNameVariable = "${HOSTNAME}";
 
 /// What the next value is, or what the array or object around it is.
 enum class Slot : std::uint8_t {
@@ -69,18 +66,6 @@ const char* wanted(Slot slot) {
             return "any value will do";
     }
 }
-
-/// A node as far as it has been read. Nodes are kept in the order in which their
-/// objects begin, which is document order, depth first.
-struct ReadNode {
-    Snapshot::Index parent = Snapshot::none;
-    std::string type;
-    std::size_t typeAt = 0;  ///< offset in the text
-    std::string description;
-    std::size_t nameAt = 0;  ///< offset of the value of its Name
-    std::vector<SnapshotProperty> properties;
-    std::vector<NodeLexicon::Properties> readOnly;
-};
 
 /// Takes the parser's events into nodes. A fault ends the parsing: each handler
 /// returns whether to go on.
@@ -343,59 +328,6 @@ class TreeReader {
         }
     }
 
-    /// The name of a node; null when it has none.
-    static const std::string* nameOf(const ReadNode& node) {
-        for (const SnapshotProperty& property : node.properties) {
-            if (property.id == NodeLexicon::Properties::Name) {
-                return std::get_if<std::string>(&property.value);
-            }
-        }
-        return nullptr;
-    }
-
-    [[nodiscard]] const ReadNode* parentOf(const ReadNode* node) const {
-        return node == nullptr || node->parent == Snapshot::none ? nullptr : &nodes_[node->parent];
-    }
-
-    static bool isServiceProcessor(const ReadNode* computer) {
-        return computer != nullptr &&
-               computer->description == NodeLexicon::serviceProcessorDescription;
-    }
-
-    /// Looks for what only shows when the whole tree has been read.
-    void lookAtNodes() {
-        std::set<std::pair<bool, std::string_view>> interfaces;
-        for (const ReadNode& each : nodes_) {
-            const ReadNode* const parent = parentOf(&each);
-            slips_.add(each.typeAt, slipOfType(each.type, parent == nullptr ? std::string_view{}
-                                                                            : parent->type));
-            const std::string* const name = nameOf(each);
-            const auto type = NodeLexicon::nodeTypeOf(each.type);
-            if (name != nullptr && type == NodeLexicon::NodeType::NetworkInterface) {
-                const bool ofProcessor = isServiceProcessor(parentOf(parent));
-                if (!interfaces.emplace(ofProcessor, *name).second) {
-                    slips_.add(each.nameAt,
-                               "there is an interface \"" + *name +
-                                   "\" already: the instances of both have the same keys");
-                }
-            } else if (name != nullptr && type == NodeLexicon::NodeType::ComputerSystem &&
-                       !isServiceProcessor(&each) && !hostName_.empty() && *name != hostName_) {
-                slips_.add(each.nameAt, foreignName(*name));
-            }
-        }
-    }
-
-    /// What it means that a computer has another name than this machine: instances of
-    /// interfaces name this machine as their system, and only the computer itself is
-    /// called as its node is.
-    [[nodiscard]] std::string foreignName(const std::string& name) const {
-        return "the computer is called \"" + name + "\" and this machine \"" + hostName_ +
-               "\", which the instances of its interfaces name as their system: "
-               "QVXZR_HostedDHCPPoint and QVXZR_DHCPRemoteHostedAccessPoint have no instance "
-               "for it; \"" +
-               std::string(hostNameVariable) + "\" stands for the name of any machine";
-    }
-
     void set(PropertyValue value) {
         auto& properties = node().properties;
         const auto present =
@@ -488,7 +420,7 @@ class TreeReader {
     }
 
     [[nodiscard]] std::shared_ptr<const Snapshot> snapshot() {
-        lookAtNodes();
+        slips_.addFrom(nodes_, hostName_);
         SnapshotBuilder builder;
         for (ReadNode& each : nodes_) {
             builder.add(each.parent, std::move(each.type), std::move(each.description));

@@ -5,6 +5,8 @@
 #include <algorithm>
 #include <array>
 #include <limits>
+#include <set>
+#include <variant>
 
 #include "sources/TokenTracker.h"
 
@@ -111,6 +113,35 @@ std::string lowered(std::string_view text) {
     return result;
 }
 
+/// The name of a node; null when it has none.
+const std::string* nameOf(const ReadNode& node) {
+    for (const SnapshotProperty& property : node.properties) {
+        if (property.id == Properties::Name) {
+            return std::get_if<std::string>(&property.value);
+        }
+    }
+    return nullptr;
+}
+
+const ReadNode* parentOf(const ReadNode* node, const std::vector<ReadNode>& nodes) {
+    return node == nullptr || node->parent == Snapshot::none ? nullptr : &nodes[node->parent];
+}
+
+bool isServiceProcessor(const ReadNode* computer) {
+    return computer != nullptr && computer->description == NodeLexicon::serviceProcessorDescription;
+}
+
+/// What it means that a computer has another name than this machine: instances of
+/// interfaces name this machine as their system, and only the computer itself is called
+/// as its node is.
+std::string foreignName(const std::string& name, const std::string& hostName) {
+    return "the computer is called \"" + name + "\" and this machine \"" + hostName +
+           "\", which the instances of its interfaces name as their system: "
+           "QVXZR_HostedDHCPPoint and QVXZR_DHCPRemoteHostedAccessPoint have no instance for "
+           "it; \"" +
+           std::string(hostNameVariable) + "\" stands for the name of any machine";
+}
+
 }  // namespace
 
 std::string slipOfKind(Properties id, JsonKind found) {
@@ -179,6 +210,27 @@ std::string slipOfType(std::string_view type, std::string_view parentType) {
 void TreeSlips::add(std::size_t offset, std::string reason) {
     if (!name_.empty() && !reason.empty()) {
         slips_.emplace_back(offset, std::move(reason));
+    }
+}
+
+void TreeSlips::addFrom(const std::vector<ReadNode>& nodes, const std::string& hostName) {
+    std::set<std::pair<bool, std::string_view>> interfaces;
+    for (const ReadNode& each : nodes) {
+        const ReadNode* const parent = parentOf(&each, nodes);
+        add(each.typeAt,
+            slipOfType(each.type, parent == nullptr ? std::string_view{} : parent->type));
+        const std::string* const name = nameOf(each);
+        const auto type = NodeLexicon::nodeTypeOf(each.type);
+        if (name != nullptr && type == NodeLexicon::NodeType::NetworkInterface) {
+            // The keys of the service processor's interfaces are others.
+            if (!interfaces.emplace(isServiceProcessor(parentOf(parent, nodes)), *name).second) {
+                add(each.nameAt, "there is an interface " + inQuotes(*name) +
+                                     " already: the instances of both have the same keys");
+            }
+        } else if (name != nullptr && type == NodeLexicon::NodeType::ComputerSystem &&
+                   !isServiceProcessor(&each) && !hostName.empty() && *name != hostName) {
+            add(each.nameAt, foreignName(*name, hostName));
+        }
     }
 }
 

@@ -8,8 +8,25 @@
 #include <vector>
 
 #include "zrclient/NodeLexicon.h"
+#include "zrclient/Snapshot.h"
 
 namespace ZR {
+
+/// A node of a JSON tree as far as it has been read. Nodes are kept in the order in which
+/// their objects begin, which is document order, depth first. Places are offsets in the
+/// text.
+struct ReadNode {
+    Snapshot::Index parent = Snapshot::none;
+    std::string type;
+    std::size_t typeAt = 0;
+    std::string description;
+    std::size_t nameAt = 0;  ///< of the value of its Name
+    std::vector<SnapshotProperty> properties;
+    std::vector<NodeLexicon::Properties> readOnly;
+};
+
+/// In a text it stands for the name of the machine that reads the tree.
+inline constexpr std::string_view hostNameVariable = "${HOSTNAME}";
 
 /// What a value in a JSON text can be.
 enum class JsonKind : std::uint8_t { truth, number, text, list, other };
@@ -41,6 +58,10 @@ class TreeSlips {
 
     /// Adds what is wrong at an offset of the text. Nothing for an empty reason.
     void add(std::size_t offset, std::string reason);
+
+    /// Adds what only shows when all nodes have been read, on a machine of that name:
+    /// types, interfaces of one name, and the name of another machine.
+    void addFrom(const std::vector<ReadNode>& nodes, const std::string& hostName);
 
     /// "NAME:LINE:COLUMN: REASON" each, in the order of the text; of many the first few,
     /// and how many more there are.
