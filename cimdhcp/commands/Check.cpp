@@ -14,7 +14,6 @@
 #include "client/EmbeddedClient.h"
 #include "client/Response.h"
 #include "commands/DataDirectory.h"
-#include "commands/HiddenClients.h"
 #include "commands/MachineFindings.h"
 #include "commands/PlatformSetup.h"
 #include "text/DisplayText.h"
@@ -107,20 +106,8 @@ class Examination {
                 "\"cimdhcp tree --explain\" shows what is seen, and from where; DHCP is on where a "
                 "client runs or the address came from one");
         }
-        if (tree.empty()) {
-            lookAtProcesses();
-        }
         for (Finding& finding : machineFindings(machine, now_)) {
             findings_.push_back(std::move(finding));
-        }
-    }
-
-    /// Clients may be among processes that this user cannot see.
-    void lookAtProcesses() {
-        if (areProcessesHidden()) {
-            add(Verdict::notable, "rights",
-                "/proc hides the processes of other users: DHCP clients among them are not seen",
-                "run as root, or add the user to the group that /proc is mounted for (gid=)");
         }
     }
 
