@@ -141,6 +141,11 @@ TEST_F(LiveMachineTest, NetworkdItselfTellsOfTheServerOfADhcpv6Lease) {
     runNetworkd();
     root_.write("/run/systemd/netif/links/2", sample("networkd/run-systemd-netif-links-2.txt"));
     networkd_.json = sample("networkd/networkctl-status-eth1.json");
+    // The kernel of this test sets addresses without an end.
+    for (std::size_t at = 0;
+         (at = networkd_.json.find("ValidLifetimeUsec", at)) != std::string::npos;) {
+        networkd_.json.replace(at, 1, "X");
+    }
     ifaddrmsg info{};
     info.ifa_family = 10;
     info.ifa_prefixlen = 128;

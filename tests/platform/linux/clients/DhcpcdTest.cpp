@@ -191,6 +191,8 @@ TEST_F(DhcpcdTest, AWirelessLeaseIsClaimedForEachPossibleInterface) {
 
 TEST_F(DhcpcdTest, AFileThatOthersCouldHaveWrittenIsNotBelieved) {
     write("/var/lib/dhcpcd/eth1.lease", sample("dhcpcd-10/eth1.lease"));
+    // In a directory that no one else may enter, there are no others.
+    std::filesystem::permissions(root_.path(), std::filesystem::perms{0755});
     std::filesystem::permissions(root_.path("/var/lib/dhcpcd/eth1.lease"),
                                  std::filesystem::perms::others_write,
                                  std::filesystem::perm_options::add);

@@ -279,6 +279,8 @@ TEST_F(NetworkManagerTest, FilesThatAreNotDevicesAreNotLookedAt) {
 
 TEST_F(NetworkManagerTest, AFileThatOthersCouldHaveWrittenIsNotBelieved) {
     root_.write(state, sample("networkmanager-internal/run-NetworkManager-devices-2.txt"));
+    // In a directory that no one else may enter, there are no others.
+    std::filesystem::permissions(root_.path(), std::filesystem::perms{0755});
     std::filesystem::permissions(root_.path("/run/NetworkManager/devices/2"),
                                  std::filesystem::perms::others_write,
                                  std::filesystem::perm_options::add);

@@ -208,6 +208,8 @@ TEST_F(NetworkdTest, ANetworkFileThatIsNotAFileIsReported) {
 
 TEST_F(NetworkdTest, AFileThatOthersCouldHaveWrittenIsNotBelieved) {
     root_.write("/run/systemd/netif/leases/2", sample("networkd/run-systemd-netif-leases-2.txt"));
+    // In a directory that no one else may enter, there are no others.
+    std::filesystem::permissions(root_.path(), std::filesystem::perms{0755});
     std::filesystem::permissions(root_.path("/run/systemd/netif/leases/2"),
                                  std::filesystem::perms::others_write,
                                  std::filesystem::perm_options::add);

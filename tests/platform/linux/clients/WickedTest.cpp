@@ -191,6 +191,8 @@ TEST_F(WickedTest, ATornFileIsReportedAndOthersAreNotLookedAt) {
 
 TEST_F(WickedTest, AFileThatOthersCouldHaveWrittenIsNotBelieved) {
     root_.write(file, lease4);
+    // In a directory that no one else may enter, there are no others.
+    std::filesystem::permissions(root_.path(), std::filesystem::perms{0755});
     std::filesystem::permissions(root_.path("/var/lib/wicked/lease-eth1-dhcp-ipv4.xml"),
                                  std::filesystem::perms::others_write,
                                  std::filesystem::perm_options::add);
