@@ -31,6 +31,12 @@ class Teller {
         }
     }
 
+    void tellOfStrayed(const ClientProcess& process) {
+        tell(Kind::Note, describe({.client = process.client, .file = {}, .pid = process.pid}) +
+                             " was started for " + std::string{process.interfaces.front().view()} +
+                             ", a name that no link has: whether it has this link cannot be told");
+    }
+
     /// Where all clients are seen.
     void tellOfClientsThatAreMissing() {
         if (decidedOn(Properties::DHCPEnabled) == PropertyValue{false}) {
@@ -123,6 +129,8 @@ void addDiagnostics(const Machine& machine, const InterfaceView& view,
     Teller teller{machine, view, decisions, diagnostics};
     if (view.enslaved) {
         teller.tellOfPort();
+    } else if (view.strayed != nullptr) {
+        teller.tellOfStrayed(*view.strayed);
     } else if (!view.hidden) {
         teller.tellOfClientsThatAreMissing();
     }

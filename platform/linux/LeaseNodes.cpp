@@ -199,8 +199,14 @@ bool addFamily(bool ipv6, const DecidedInterface& interface, Explain explain,
         // What runs besides may be what the manager started.
         return true;
     }
-    for (const ClientProcess* process : view.processes) {
-        if (process->ipv6 == ipv6 && !isHeldBy(process->client, leases)) {
+    for (auto each = view.processes.begin(); each != view.processes.end(); ++each) {
+        const ClientProcess* const process = *each;
+        // One that waits for its first lease may run beside the parent that waits for it.
+        const bool told =
+            std::any_of(view.processes.begin(), each, [&](const ClientProcess* before) {
+                return before->client == process->client && before->ipv6 == ipv6;
+            });
+        if (process->ipv6 == ipv6 && !told && !isHeldBy(process->client, leases)) {
             addClient({.client = process->client, .file = {}, .pid = process->pid},
                       "a client runs on the link", ipv6, interface, explain, builder);
             any = true;

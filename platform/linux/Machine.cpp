@@ -239,11 +239,34 @@ void Machine::collectProcesses() {
     }
 }
 
+/// A client that was started under names which links no longer have, and that no socket gives
+/// away: a udhcpc sleeps without any while it is bound. nullptr without one.
+const ClientProcess* Machine::findStrayed() {
+    for (const auto* processes : {&facts_.clients.processes, &facts_.clients.hiddenClients}) {
+        for (const ClientProcess& process : *processes) {
+            const bool named =
+                std::any_of(process.interfaces.begin(), process.interfaces.end(),
+                            [&](const InterfaceName& name) { return find(name) != nullptr; });
+            const bool heard = process.heardLinks && !process.heardLinks->empty();
+            if (!process.ipv6 && !process.interfaces.empty() && !named && !heard) {
+                return &process;
+            }
+        }
+    }
+    return nullptr;
+}
+
 void Machine::collectHidden() {
     const auto& hidden = facts_.clients.hiddenClients;
+    const ClientProcess* const strayed = findStrayed();
     for (InterfaceView& view : views_) {
+        const bool unexplained = view.leases.empty() && view.managements.empty() &&
+                                 view.processes.empty() &&
+                                 std::any_of(view.addresses.begin(), view.addresses.end(),
+                                             [](const Address& each) { return each.ip.isIPv4(); });
+        view.strayed = unexplained ? strayed : nullptr;
         const Link& link = *view.link;
-        view.hidden = facts_.clients.processesHidden ||
+        view.hidden = facts_.clients.processesHidden || view.strayed != nullptr ||
                       std::any_of(hidden.begin(), hidden.end(), [&](const ClientProcess& process) {
                           return process.interfaces.empty() ? (link.flags & IFF_BROADCAST) != 0
                                                             : process.serves(link.name);

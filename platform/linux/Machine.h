@@ -41,9 +41,10 @@ struct InterfaceView {
     const PortSocket* socket = nullptr;      ///< a DHCP client's, bound to an address of the link
     const PortSocket* openSocket = nullptr;  ///< one of all links, beside one that hears this link
     /// A client may have the link without being seen: this user may not see all processes,
-    /// or not where they run.
+    /// or not where they run, or one was started under a name that no link has any more.
     bool hidden = false;
-    const Address* address = nullptr;  ///< the one that was decided on
+    const ClientProcess* strayed = nullptr;  ///< the latter; it may have any such link
+    const Address* address = nullptr;        ///< the one that was decided on
 
     /// The first program that runs and takes an address of the link by DHCP of this family;
     /// null for none.
@@ -118,6 +119,7 @@ class Machine {
     void collectManagements();
     void collectProcesses();
     void addProcess(const ClientProcess& process, InterfaceView& view) const;
+    const ClientProcess* findStrayed();
     void collectHidden();
     void collectSockets();
     void collectBootLease();

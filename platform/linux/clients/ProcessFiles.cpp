@@ -9,6 +9,7 @@
 #include <cstddef>
 #include <string>
 
+#include "formats/Directory.h"
 #include "formats/Files.h"
 #include "formats/SystemErrors.h"
 
@@ -22,6 +23,23 @@ std::string readLink(const std::string& path) {
     const ssize_t length = ::readlink(path.c_str(), target.data(), target.size());
     return length <= 0 ? std::string{}
                        : std::string(target.data(), static_cast<std::size_t>(length));
+}
+
+/// The name of a file that a process has open and that ends with this one; empty for none.
+/// A client that has left the directory in which it was started still has its file.
+std::string openFile(const std::string& process, std::string_view path) {
+    const std::string end = '/' + std::string{path.substr(path.starts_with("./") ? 2 : 0)};
+    const std::string descriptors = process + "/fd";
+    Directory directory{descriptors};
+    if (directory) {
+        for (std::string_view name = directory.next(); !name.empty(); name = directory.next()) {
+            std::string target = readLink(pathIn(descriptors, name));
+            if (target.starts_with('/') && target.ends_with(end)) {
+                return target;
+            }
+        }
+    }
+    return {};
 }
 
 /// Whether two names are those of one existing file or directory.
@@ -54,6 +72,9 @@ std::optional<ProcessFile> fileOfProcess(const Roots& roots, const ClientProcess
         return seesOtherFiles(roots, directory)
                    ? ProcessFile{.path = std::string{path}, .root = directory + "/root"}
                    : ProcessFile{.path = roots.path(path), .root = {}};
+    }
+    if (const std::string open = openFile(directory, path); !open.empty()) {
+        return fileOfProcess(roots, process, open, diagnostics);
     }
     const std::string working = readLink(directory + "/cwd");
     const int error = errno;
