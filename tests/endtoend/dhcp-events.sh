@@ -28,6 +28,7 @@ gives_up=no           # whether it soon takes an address of its own where no ser
 address_stays=no      # whether its address stays when it is killed and the lease ends
 without_cable=true    # DHCPEnabled when the cable is out and the address gone
 drops_address=yes     # whether it takes its address away when the cable is out
+loses_name=no         # whether nothing ties it to its link then
 follows_name=yes      # whether it goes on when its link gets another name
 source "$clients/$kind.sh"
 
@@ -144,7 +145,11 @@ life() {
     if [[ $follows_name == yes ]]; then
         ip -n "$client" link set eth1 name lan0
         current=lan0
-        bound "under another name" 198.51.100.2
+        if [[ $loses_name == no ]]; then
+            bound "under another name" 198.51.100.2
+        else
+            truth "under another name" enabled='@(true|unknown)' source='@(1|none)'
+        fi
         current=eth1
         truth "its former name" link=no
         ip -n "$client" link set lan0 name eth1

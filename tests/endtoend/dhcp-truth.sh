@@ -139,8 +139,10 @@ false_classes() {
         instances QVXZR_DHCPProtocolEndpoint ClientState "$current" "$@")
     value=${value//$'\n'/ }
     [[ $value == "$expected" ]] || echo "endpoint: true is '$expected', shown '$value'"
-    servers=$(instances QVXZR_DHCPRemoteServiceAccessPoint AccessInfo "${current}_IPv4" "$@" |
-        jq -rs 'join(",")')
+    servers=$({
+        instances QVXZR_DHCPRemoteServiceAccessPoint AccessInfo "${current}_IPv4" "$@"
+        instances QVXZR_DHCPRemoteServiceAccessPoint AccessInfo "${current}_IPv6" "$@"
+    } | jq -rs 'join(",")')
     [[ ${servers:-none} == "${seen[servers]}" ]] || echo "access points: true is ${seen[servers]}, shown $servers"
     value=$(instances QVXZR_DHCPSettingData RequestedIPv4Address "$current" "$@" | jq -r .)
     [[ ${value:-none} == "${seen[address]}" || ${seen[enabled]} != true ]] ||

@@ -3,3 +3,4 @@ source "$clients/udhcpc.sh"
 state_file=/run/laboratory.state
 write_udhcpc_script
 tells_server=no
+loses_name=yes
