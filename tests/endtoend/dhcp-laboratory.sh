@@ -1,20 +1,22 @@
 # Two machines in a laboratory, for tests to source: a DHCP server (dnsmasq) and a
 # client on the two ends of a veth pair, each in a network namespace of its own. The
-# client also has file systems of its own wherever DHCP clients write, and processes of
-# its own, so that nothing of the machine that runs the test is touched or read: clients
-# of other tests, too, would be seen there, and could not be told from ours by all users.
+# client also has file systems of its own wherever DHCP clients read and write, and
+# processes of its own, so that nothing of the machine that runs the test is touched or
+# read: clients of other tests, too, would be seen there, and could not be told from ours
+# by all users.
 #
 # The test has set `program` to the path of cimdhcp. It gets
 #   $work           a directory that goes with the test
 #   in_client ...   runs a command on the client's machine, in_server ... on the server's
 #   signal_client SIGNAL NUMBER     sends a signal to a process of the client's machine
 #   cimdhcp ...     runs the program on the client's machine
-#   start_server    starts the server, with further options of dnsmasq
-#   fail, expect, eventually, look, seen, value, kernel_address    see below
+#   start_server    starts the server, with further options of dnsmasq; start_short_server
+#                   starts one that leases for twenty seconds
+#   fail, expect, eventually, look, seen, value, kernel_address and others    see below
 # The server is 198.51.100.1 and gives addresses from 198.51.100.100 on; the client's
 # link is eth1.
 
-for tool in ip jq dnsmasq nsenter unshare; do
+for tool in ip jq dnsmasq nsenter unshare ethtool; do
     command -v "$tool" >/dev/null || PATH=$PATH:/usr/sbin:/sbin
     command -v "$tool" >/dev/null || { echo "needs $tool"; exit 1; }
 done
@@ -66,6 +68,8 @@ ip netns add "$server"
 ip netns add "$client"
 ip link add zrs$$ netns "$server" type veth peer name eth1 netns "$client"
 ip -n "$server" address add 198.51.100.1/24 dev zrs$$
+# Clients that read packets as they come look at checksums that a veth pair leaves out.
+ip netns exec "$server" ethtool -K zrs$$ tx off >/dev/null
 ip -n "$server" link set zrs$$ up
 ip -n "$client" link set lo up
 ip -n "$client" link set eth1 up
@@ -73,13 +77,15 @@ ip -n "$client" link set eth1 up
 # One process holds the client's file systems and processes, and is the parent of those
 # that lose theirs: it has to see their ends, which their clients wait for. /sys is read-only there, as in a
 # container: programs then do not wait for a device manager that is not there.
-mkdir -p "$work/data"
-cp /etc/resolv.conf "$work/resolv.conf" 2>/dev/null || : >"$work/resolv.conf"
+mkdir -p "$work/data" "$work/etc"
 ip netns exec "$client" unshare --mount --pid --fork --kill-child --mount-proc bash -c '
     mount --make-rprivate / &&
-    mount -t tmpfs tmpfs /run && mount -t tmpfs tmpfs /var/lib &&
+    mount -t tmpfs -o mode=755 tmpfs /run && mount -t tmpfs -o mode=755 tmpfs /var/lib &&
     mkdir /var/lib/dhcp /var/lib/dhcpcd &&
-    { [ ! -e /etc/resolv.conf ] || mount --bind "$1/resolv.conf" /etc/resolv.conf; } &&
+    mount -t tmpfs -o mode=755 tmpfs "$1/etc" && cp -a /etc/. "$1/etc" && mount --bind "$1/etc" /etc &&
+    rm -rf /etc/network/interfaces* /etc/netplan /etc/sysconfig /etc/systemd/network/* \
+        /etc/NetworkManager/system-connections/* /etc/NetworkManager/conf.d/* &&
+    : >/etc/network/interfaces &&
     mount -o remount,bind,ro /sys && : >"$1/ready" &&
     while :; do sleep 3600 & wait; done' bash "$work" \
     >"$work/holder.log" 2>&1 &
@@ -101,10 +107,12 @@ cimdhcp() {
     in_client env ZR_LOG_SINK=stderr ZR_DATA_DIR="$work/data" "$program" "$@"
 }
 
+# What the server gives addresses from; a test may change it.
+range=198.51.100.100,198.51.100.150
 start_server() {
     in_server dnsmasq --keep-in-foreground --conf-file=/dev/null --port=0 \
-        --interface=zrs$$ --bind-interfaces --dhcp-authoritative --no-ping --user=root \
-        --dhcp-range=198.51.100.100,198.51.100.150,255.255.255.0,10m \
+        --interface=zrs$$ --bind-interfaces --dhcp-authoritative --no-ping --log-dhcp --log-facility=- --user=root \
+        --dhcp-range=$range,255.255.255.0,10m \
         --dhcp-leasefile="$work/server.leases" --pid-file="$work/dnsmasq.pid" \
         "$@" >"$work/dnsmasq.log" 2>&1 &
     disown  # its end is no news
@@ -112,11 +120,10 @@ start_server() {
 
 # Another server takes the place of the first: 198.51.100.2, with the same addresses to give.
 change_server() {
-    kill "$(<"$work/dnsmasq.pid")"
-    eventually test ! -e "$work/dnsmasq.pid"
+    stop_server
     ip -n "$server" address delete 198.51.100.1/24 dev zrs$$
     ip -n "$server" address add 198.51.100.2/24 dev zrs$$
-    start_server
+    start_server "$@"
 }
 # When the server's only lease ends, in seconds since the epoch.
 lease_end() {
@@ -143,4 +150,75 @@ value() {
 kernel_address() {
     ip -n "$client" -j -4 address show dev "${1:-eth1}" |
         jq -r '[.[].addr_info[]? | select(.scope == "global") | .local] | .[0] // empty'
+}
+
+# write_in_client FILE: makes a file on the client's machine of what is given to it.
+write_in_client() {
+    in_client sh -c 'mkdir -p "$(dirname "$1")" && cat >"$1"' sh "$1"
+}
+# background COMMAND...: runs a command on the client's machine, and does not wait for it.
+background() {
+    in_client "$@" </dev/null >>"$work/client.log" 2>&1 &
+    disown  # its end is no news
+}
+# pids_of NAME...: of the client's processes, those of these names, by their numbers here.
+pids_of() {
+    local pid name
+    for pid in $(ip netns pids "$client"); do
+        for name in "$@"; do
+            [[ $(cat "/proc/$pid/comm" 2>/dev/null) != "$name" ]] || echo "$pid"
+        done
+    done
+}
+is_running() {
+    [[ -n $(pids_of "$@") ]]
+}
+not_running() {
+    ! is_running "$@"
+}
+# kill_processes SIGNAL NAME...: and waits for their ends.
+kill_processes() {
+    local signal=$1
+    shift
+    # shellcheck disable=SC2046 # numbers
+    kill -s "$signal" $(pids_of "$@") 2>/dev/null || true
+    eventually not_running "$@"
+}
+no_address() {
+    [[ -z $(kernel_address "$1") ]]
+}
+
+# The server that leases for 20 seconds, the least that all clients accept.
+start_short_server() {
+    cat >"$work/udhcpd.conf" <<FILE
+start 198.51.100.100
+end 198.51.100.150
+interface zrs$$
+min_lease 10
+lease_file $work/udhcpd.leases
+pidfile $work/udhcpd.pid
+option subnet 255.255.255.0
+option router 198.51.100.1
+option lease 20
+FILE
+    : >"$work/udhcpd.leases"
+    in_server udhcpd -f "$work/udhcpd.conf" >"$work/udhcpd.log" 2>&1 &
+    disown
+}
+stop_short_server() {
+    kill "$(<"$work/udhcpd.pid")"
+    eventually test ! -e "$work/udhcpd.pid"
+}
+stop_server() {
+    kill "$(<"$work/dnsmasq.pid")"
+    eventually test ! -e "$work/dnsmasq.pid"
+}
+
+need() {
+    command -v "$1" >/dev/null || { echo "needs $1"; exit 1; }
+}
+start_bus() {
+    in_client mkdir -p /run/dbus
+    background dbus-daemon --system --nofork --nopidfile
+    eventually in_client test -S /run/dbus/system_bus_socket || fail "no bus: $(<"$work/client.log")"
 }

@@ -1,60 +1,125 @@
 #!/usr/bin/env bash
-# A DHCPv6 client that does not tell its server's address, and no DHCPv4 at all: the link
-# shows DHCP while the client runs, and neither a server nor an IPv4 address.
+# What happens to a DHCPv6 client, and no DHCPv4 at all: after each event, what the program
+# shows is compared with what the kernel says.
 #
-# Usage: dhcp6-clients.sh PATH-OF-cimdhcp CLIENT
-# CLIENT: dhcp6c, dhclient or dhcpcd
+# Usage: dhcp6-clients.sh PATH-OF-cimdhcp PATH-OF-tree-on-request CLIENT
+# CLIENT: dhcp6c, dhclient, dhcpcd, networkd or NetworkManager
 set -euo pipefail
 
 program=$1
-kind=$2
+tree_on_request=$2
+kind=$3
+subject="$kind, DHCPv6"
 source "$(dirname "$0")/dhcp-laboratory.sh"
-command -v "$kind" >/dev/null || { echo "needs $kind"; exit 1; }
+source "$(dirname "$0")/dhcp-truth.sh"
 
 in_server ip address add 2001:db8:99::1/64 dev zrs$$ nodad
-start_server --enable-ra --dhcp-range=2001:db8:99::100,2001:db8:99::1ff,64,10m
+start_server6() {
+    start_server --enable-ra --dhcp-range=2001:db8:99::100,2001:db8:99::1ff,64,10m
+}
+# A manager has the link in its hands when it asks.
+managed=no
+# Whether a file or a bus tells of the lease.
+tells_lease=yes
 
 case $kind in
     dhcp6c)
+        need dhcp6c
+        processes=(dhcp6c)
+        client_name=dhcp6c
+        tells_lease=no
         in_client mkdir -p /var/lib/dhcpv6
-        in_client tee /run/dhcp6c.conf >/dev/null <<'FILE'
+        write_in_client /run/dhcp6c.conf <<'FILE'
 interface eth1 {
     send ia-na 0;
 };
 id-assoc na 0 {
 };
 FILE
-        start_client() {
-            in_client dhcp6c -f -c /run/dhcp6c.conf -p /run/dhcp6c.pid eth1 </dev/null \
-                >"$work/client.log" 2>&1 &
-            disown  # its end is no news
-        }
+        start_client() { background dhcp6c -f -c /run/dhcp6c.conf -p /run/dhcp6c.pid eth1; }
         stop_client() { signal_client TERM "$(in_client cat /run/dhcp6c.pid)"; }
         ;;
     dhclient)
-        start_client() {
-            in_client dhclient -6 -1 -q -pf "$work/client.pid" eth1 </dev/null \
-                >"$work/client.log" 2>&1
-        }
+        need dhclient
+        processes=(dhclient)
+        client_name=dhclient
+        start_client() { background dhclient -6 -d -q -pf "$work/client.pid" eth1; }
         stop_client() {
-            in_client dhclient -6 -r -q -pf "$work/client.pid" eth1 </dev/null \
-                >"$work/client.log" 2>&1
+            in_client dhclient -6 -r -q -pf "$work/client.pid" eth1 </dev/null >>"$work/client.log" 2>&1
         }
         ;;
     dhcpcd)
+        need dhcpcd
+        processes=(dhcpcd)
+        client_name=dhcpcd
         # Without advertisements it would wait for them: it is told to ask at once.
-        in_client tee /run/dhcpcd.conf >/dev/null <<'FILE'
+        write_in_client /run/dhcpcd.conf <<'FILE'
 noipv6rs
 interface eth1
     ia_na 1
 FILE
-        start_client() {
-            in_client dhcpcd -f /run/dhcpcd.conf --nohook resolv.conf --noipv4ll --nodelay \
-                --nodev -6 -w eth1 </dev/null >"$work/client.log" 2>&1
-        }
+        dhcpcd_options=(-f /run/dhcpcd.conf --nohook resolv.conf --noipv4ll --nodelay --nodev -6)
+        start_client() { in_client dhcpcd -b "${dhcpcd_options[@]}" eth1 </dev/null >>"$work/client.log" 2>&1; }
         stop_client() {
-            in_client dhcpcd -f /run/dhcpcd.conf -6 -k eth1 </dev/null >"$work/client.log" 2>&1
+            in_client dhcpcd -f /run/dhcpcd.conf -6 -k eth1 </dev/null >>"$work/client.log" 2>&1
         }
+        ;;
+    networkd)
+        networkd=/lib/systemd/systemd-networkd
+        need $networkd
+        processes=(systemd-network)
+        client_name=systemd-networkd
+        managed=yes
+        in_client mkdir -p /run/systemd/netif/links /run/systemd/netif/leases /run/systemd/netif/lldp
+        in_client chown -R systemd-network: /run/systemd/netif
+        write_in_client /etc/systemd/network/10-eth1.network <<'FILE'
+[Match]
+Name=eth1
+[Network]
+DHCP=ipv6
+[DHCPv6]
+WithoutRA=solicit
+FILE
+        start_client() { background env container=laboratory $networkd; }
+        stop_client() { kill_processes TERM systemd-network; }
+        start_bus
+        ;;
+    NetworkManager)
+        need NetworkManager
+        need nmcli
+        processes=(NetworkManager)
+        client_name=NetworkManager
+        managed=yes
+        in_client mkdir -p /run/NetworkManager/conf.d /var/lib/NetworkManager
+        write_in_client /run/NetworkManager/laboratory.conf <<'FILE'
+[main]
+plugins=keyfile
+no-auto-default=*
+dns=none
+rc-manager=unmanaged
+FILE
+        write_in_client /etc/NetworkManager/system-connections/office.nmconnection <<'FILE'
+[connection]
+id=office
+uuid=11111111-2222-4333-8444-555555555555
+type=ethernet
+interface-name=eth1
+[ipv4]
+method=disabled
+[ipv6]
+method=dhcp
+FILE
+        in_client chmod 600 /etc/NetworkManager/system-connections/office.nmconnection
+        start_client() {
+            if ! is_running NetworkManager; then
+                background NetworkManager --no-daemon --config /run/NetworkManager/laboratory.conf \
+                    --config-dir /run/NetworkManager/conf.d
+                eventually in_client nmcli general status
+            fi
+            eventually in_client nmcli --wait 0 connection up office
+        }
+        stop_client() { in_client nmcli connection down office >>"$work/client.log" 2>&1; }
+        start_bus
         ;;
     *)
         echo "no such client: $kind"
@@ -62,41 +127,67 @@ FILE
         ;;
 esac
 
+leased_address6() {
+    ip -n "$client" -j -6 address show dev eth1 |
+        jq -r '[.[].addr_info[]? | select(.local // "" | startswith("2001:db8:99::1"))
+               | select(.tentative | not) | .local] | .[0] // empty'
+}
 leased6() {
-    [[ -n $(ip -n "$client" -j -6 address show dev eth1 |
-        jq -r '.[].addr_info[]? | select(.local // "" | startswith("2001:db8:99::1"))
-               | select(.tentative | not) | .local') ]]
+    [[ -n $(leased_address6) ]]
 }
 not_leased6() {
     ! leased6
 }
 explain() {
-    echo "--- the program:"; cimdhcp tree --explain
     echo "--- the kernel:"; ip -n "$client" address show dev eth1
     echo "--- the client:"; tail -20 "$work/client.log"
     echo "--- the server:"; tail -20 "$work/dnsmasq.log"
 }
-# shows DHCPEnabled: what the tree has, now.
-shows() {
-    look || return 1
-    [[ $(seen DHCPEnabled) == "$1" && $(seen DHCPServerAddresses) == '[]' &&
-        $(seen AddressSource) == 0 && -z $(seen IPv4Address) ]]
-}
-
 # A link has no address for DHCPv6 to be asked from before its own is known to be unique.
 link_local() {
     [[ -n $(ip -n "$client" -j -6 address show dev eth1 |
         jq -r '.[].addr_info[]? | select(.scope == "link" and (.tentative | not)) | .local') ]]
 }
-eventually link_local || { explain; fail "no address of the link"; }
-eventually shows false || { explain; fail "DHCP without a client"; }
+nothing6() {
+    truth "$1" enabled=false source=0 servers=none lease4=none lease6=none
+}
+bound6() {
+    if [[ $tells_lease == yes ]]; then
+        truth "$1" enabled=true source=1 servers='@(none|fe80:*)' lease4=none \
+            lease6="$client_name @(5|8) $(leased_address6) @(-|fe80:*)"
+    else
+        truth "$1" enabled=true source='@(0|1)' servers=none lease4=none \
+            lease6="$client_name @(0|5|8) @(-|$(leased_address6)) -"
+    fi
+}
 
+eventually link_local || { explain; fail "no address of the link"; }
+nothing6 "before it runs"
 start_client || { explain; fail "$kind does not start"; }
+eventually is_running "${processes[@]}"
+# Without a router, a manager may have nothing to ask for.
+[[ $managed == yes ]] ||
+    truth "no server" enabled=true source=0 servers=none lease4=none lease6="$client_name [023467] - -"
+
+start_server6
 eventually leased6 || { explain; fail "$kind gets no lease"; }
-eventually shows true || { explain; fail "$kind: the program shows something else"; }
-expect "$kind" cimdhcp tree --explain
+bound6 "a lease"
+
+ip -n "$client" -6 address flush dev eth1 scope global
+sleep 0.3
+leased6 || truth "the address flushed" enabled=true source=0 servers=none lease4=none
 
 stop_client || { explain; fail "$kind does not give the lease back"; }
 eventually not_leased6 || { explain; fail "$kind keeps the address"; }
-eventually shows false || { explain; fail "$kind: DHCP after its end"; }
-echo "$kind: passed"
+nothing6 "released"
+
+start_client || { explain; fail "$kind does not start again"; }
+eventually leased6 || { explain; fail "$kind gets no lease again"; }
+bound6 "a lease again"
+kill_processes KILL "${processes[@]}"
+truth "killed while the lease runs" link=yes lease4=none
+# As the kernel does when the lease ends.
+ip -n "$client" -6 address delete "$(leased_address6)/128" dev eth1 2>/dev/null ||
+    ip -n "$client" -6 address flush dev eth1 scope global
+nothing6 "killed, and no address"
+finish

@@ -1,0 +1,4 @@
+# NetworkManager, which starts dhclient.
+need dhclient
+backend=dhclient
+source "$clients/NetworkManager.sh"

@@ -1,0 +1,4 @@
+# NetworkManager, which starts dhcpcd.
+need dhcpcd
+backend=dhcpcd
+source "$clients/NetworkManager.sh"

@@ -1,0 +1,5 @@
+# ISC dhclient with a lease file where no one would look for it.
+source "$clients/dhclient.sh"
+leases=/run/laboratory/eth1.db
+dhclient_options+=(-lf $leases)
+in_client mkdir /run/laboratory

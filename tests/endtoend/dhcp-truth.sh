@@ -1,0 +1,221 @@
+# What is true at a moment, compared with what the program shows then, for tests to source
+# after dhcp-laboratory.sh. Asked are, each time,
+#   - the program, started for the one question, and a process that has run since the first,
+#   - their instances of the classes: of the program, and of its server over HTTP.
+#
+# The test has set `program` and `tree_on_request` to the paths of the two programs, and
+# `subject` to what its lines begin with. It gets
+#   truth MOMENT FACT=PATTERN...    compares; a pattern is one of the shell's. Facts are
+#       link      yes or no: whether the interface is there
+#       enabled   DHCPEnabled: true, false or unknown
+#       source    AddressSource: a number, or none
+#       servers   the servers with commas between them, or none
+#       lease4    of each lease or asking client of IPv4, "CLIENT STATE ADDRESS SERVER",
+#                 with "-" for what is not known and commas between them; or none
+#       lease6    likewise of IPv6
+#     InterfaceState, IPv4Address and the end of a lease that the kernel knows, too, are
+#     compared with the kernel each time, a server never stands where there is no
+#     endpoint, and no source where there is no address.
+#   tells MOMENT REGEX              a line of "cimdhcp show" on standard error has it
+#   finish                          tells how many were false; the status is 1 if any was
+# A moment that is false does not end the test.
+
+truths=0
+falsehoods=0
+current=eth1
+asked=  # how many seconds ago the staying processes were started
+shopt -s extglob
+
+command -v jq >/dev/null || { echo "needs jq"; exit 1; }
+
+start_staying() {
+    coproc staying { in_client env ZR_LOG_SINK=none ZR_DATA_DIR="$work/data" "$tree_on_request" 2>&1; }
+    disown
+    in_client env ZR_LOG_SINK=none ZR_DATA_DIR="$work/data" "$program" serve --listen 127.0.0.1:5988 \
+        >"$work/serve.log" 2>&1 &
+    disown
+    eventually in_client bash -c ': >/dev/tcp/127.0.0.1/5988' || fail "no server: $(<"$work/serve.log")"
+    asked=$SECONDS
+}
+
+# staying_tree: what the process that stays tells now.
+staying_tree() {
+    local line
+    echo >&"${staying[1]}"
+    while IFS= read -r -t 10 line <&"${staying[0]}"; do
+        printf '%s\n' "$line"
+        [[ $line != '}' ]] || return 0
+    done
+    return 1
+}
+
+# facts_of FILE: those of the current interface, as lines FACT=VALUE.
+facts_of() {
+    jq -r --arg name "$current" '
+        def or_none: if length == 0 then "none" else . end;
+        def lease: .properties | [.Client, .ClientState, .Address, .ServerAddress]
+            | map(if . == null or . == "" then "-" else tostring end) | join(" ");
+        def leases($family): [.children[]? | select(.type == "DHCPLease" and .properties.Family == $family)
+            | lease] | sort | join(",") | or_none;
+        def ends($family): [.children[]? | select(.type == "DHCPLease" and .properties.Family == $family)
+            | .properties.LeaseExpires // empty] | (min // "none");
+        [.. | objects | select(.type? == "NetworkInterface" and .properties.Name == $name)]
+        | if length == 0 then "link=no" else .[0] |
+            "link=yes",
+            "enabled=" + (.properties.DHCPEnabled | if . == null then "unknown" else tostring end),
+            "source=\(.properties.AddressSource // "none")",
+            "state=\(.properties.InterfaceState // "none")",
+            "address=\(.properties.IPv4Address // "none")",
+            "servers=" + ([.properties.DHCPServerAddresses[]?] | join(",") | or_none),
+            "lease4=" + leases("IPv4"),
+            "lease6=" + leases("IPv6"),
+            "end4=\(ends("IPv4"))"
+          end' "$1"
+}
+
+# kernel_end: when the kernel will remove the IPv4 address, in seconds since the epoch;
+# nothing if it will not.
+kernel_end() {
+    ip -n "$client" -j -4 address show dev "$current" 2>/dev/null | jq -r --argjson now "$(date +%s)" '
+        [.[].addr_info[]? | select(.scope == "global" and .dynamic) | .valid_life_time] | .[0] // empty
+        | . + $now'
+}
+
+# false_in FILE FACT=PATTERN...: tells each fact of the file that is not so; nothing if all are.
+false_in() {
+    local file=$1 fact pattern end value
+    shift
+    local -A seen=()
+    while IFS='=' read -r fact value; do
+        seen[$fact]=$value
+    done < <(facts_of "$file")
+    if [[ ${seen[link]:-no} == no && " $*" != *" link=no"* ]]; then
+        echo "the interface is not there; true is $*"
+        return 0
+    fi
+    for fact in "$@"; do
+        pattern=${fact#*=}
+        fact=${fact%%=*}
+        # shellcheck disable=SC2053 # patterns are meant
+        [[ ${seen[$fact]:-absent} == $pattern ]] ||
+            echo "$fact: true is $pattern, shown ${seen[$fact]:-absent}"
+    done
+    [[ ${seen[link]:-no} == yes ]] || return 0
+    [[ ${seen[enabled]} == true || ${seen[servers]} == none ]] ||
+        echo "servers: ${seen[servers]} although DHCP is ${seen[enabled]}"
+    [[ ${seen[address]} != none || ${seen[source]} == @(0|none) || ${seen[lease6]} != none ]] ||
+        echo "source: ${seen[source]} of no address"
+    end=$(kernel_end)
+    if [[ -n $end && ${seen[end4]} != none && ${seen[lease4]} != *,* && ${seen[lease4]} != *' - -' ]]; then
+        ((seen[end4] - end <= 3 && end - seen[end4] <= 3)) ||
+            echo "LeaseExpires: the kernel says $end, shown ${seen[end4]}"
+    fi
+}
+
+# instances CLASS PROPERTY NAME OPTION...: the property of those that are named, one per line.
+instances() {
+    local class=$1 property=$2 name=$3
+    shift 3
+    cimdhcp "$@" --format json instances "$class" 2>/dev/null |
+        jq -c --arg property "$property" --arg name "$name" '.instances[].properties
+            | select((.Name // .ElementName).value == $name) | .[$property].value | values'
+}
+# false_classes FILE OPTION...: as false_in, of the classes against the tree in the file.
+false_classes() {
+    local file=$1 fact value expected servers=''
+    shift
+    local -A seen=()
+    while IFS='=' read -r fact value; do
+        seen[$fact]=$value
+    done < <(facts_of "$file")
+    [[ ${seen[link]:-no} == yes ]] || return 0
+    expected=
+    # Enabled and bound; else disabled and unknown.
+    [[ ${seen[enabled]} != true ]] || case ${seen[source]}${seen[state]} in
+        11) expected='2 8' ;;
+        *) expected='3 0' ;;
+    esac
+    value=$(instances QVXZR_DHCPProtocolEndpoint EnabledState "$current" "$@"
+        instances QVXZR_DHCPProtocolEndpoint ClientState "$current" "$@")
+    value=${value//$'\n'/ }
+    [[ $value == "$expected" ]] || echo "endpoint: true is '$expected', shown '$value'"
+    servers=$({
+        instances QVXZR_DHCPRemoteServiceAccessPoint AccessInfo "${current}_IPv4" "$@"
+        instances QVXZR_DHCPRemoteServiceAccessPoint AccessInfo "${current}_IPv6" "$@"
+    } | jq -rs 'join(",")')
+    [[ ${servers:-none} == "${seen[servers]}" ]] || echo "access points: true is ${seen[servers]}, shown $servers"
+    value=$(instances QVXZR_DHCPSettingData RequestedIPv4Address "$current" "$@" | jq -r .)
+    [[ ${value:-none} == "${seen[address]}" || ${seen[enabled]} != true ]] ||
+        echo "setting data: true is ${seen[address]}, shown ${value:-none}"
+}
+
+# compare FACT=PATTERN...: what is false now goes to $work/false; the status is 1 if anything is.
+compare() {
+    local address state=0 operstate
+    address=$(kernel_address "$current" 2>/dev/null) || true
+    operstate=$(ip -n "$client" -j link show dev "$current" 2>/dev/null | jq -r '.[0].operstate')
+    [[ $operstate != @(UP|UNKNOWN) ]] || state=1
+    local -a facts=("$@")
+    [[ " $*" == *" link=no"* ]] || facts+=("address=${address:-none}" "state=$state")
+    {
+        cimdhcp tree >"$work/fresh.json" 2>"$work/fresh.log" || echo "started now: no tree"
+        staying_tree >"$work/staying.json" || echo "stays: no tree"
+        false_in "$work/fresh.json" "${facts[@]}" | sed 's/^/started now: /'
+        false_in "$work/staying.json" "${facts[@]}" | sed 's/^/stays: /'
+    } >"$work/false"
+    [[ ! -s $work/false ]] || return 1
+    {
+        false_classes "$work/fresh.json" | sed 's/^/started now: /'
+        false_classes "$work/fresh.json" --connect http://127.0.0.1:5988 | sed 's/^/serves: /'
+    } >"$work/false"
+    [[ ! -s $work/false ]]
+}
+
+# A client changes the kernel, its files and its own mind one after the other: some seconds
+# are left for the last of them.
+truth() {
+    local moment=$1 deadline=$((SECONDS + ${TRUTH_PATIENCE:-5}))
+    shift
+    [[ -n $asked ]] || start_staying
+    ((++truths))
+    until compare "$@"; do
+        if ((SECONDS > deadline)); then
+            is_false "$moment"
+            return 0
+        fi
+        sleep 0.2
+    done
+    echo "right: $subject, $moment ($SECONDS s)"
+}
+is_false() {
+    local moment=$1
+    ((++falsehoods))
+    sed "s/^/FALSE: $subject, $moment: /" "$work/false"
+    {
+        echo "--- $subject, $moment: the kernel:"; ip -n "$client" address show
+        echo "--- the program:"; cimdhcp tree --explain
+        echo "--- what it told:"; cat "$work/fresh.log"
+        echo "--- the client:"; tail -20 "$work/client.log" || true
+    } >>"$work/explained" 2>&1
+}
+
+tells() {
+    local moment=$1 regex=$2 told
+    ((++truths))
+    told=$(cimdhcp show 2>&1 >/dev/null) || true
+    if grep -Eq "$regex" <<<"$told"; then
+        echo "right: $subject, $moment, is told"
+    else
+        ((++falsehoods))
+        echo "FALSE: $subject, $moment: not told is /$regex/; told is: ${told:-nothing}"
+    fi
+}
+
+finish() {
+    if ((falsehoods != 0)); then
+        [[ ! -e $work/explained ]] || cat "$work/explained"
+        fail "$subject: $falsehoods of $truths moments"
+    fi
+    ((truths != 0)) || fail "$subject: nothing was compared"
+    echo "$subject: $truths moments passed"
+}
