@@ -1,7 +1,6 @@
 #include "commands/GraphDrawing.h"
 
 #include <spawn.h>
-#include <sys/mman.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -10,47 +9,13 @@
 #include <string_view>
 #include <system_error>
 
+#include "commands/MemoryFile.h"
 #include "text/Failure.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace cimdhcp {
 
 namespace {
-
-/// A file without a name. Two of them stand between the programs instead of pipes:
-/// whatever the sizes, neither program ever waits for the other to read.
-ZR::UniqueFd memoryFile(const char* name) {
-    ZR::UniqueFd file(::memfd_create(name, MFD_CLOEXEC));
-    if (!file) {
-        throw std::system_error(errno, std::generic_category(), "memfd_create");
-    }
-    return file;
-}
-
-void writeWhole(int file, std::string_view text) {
-    while (!text.empty()) {
-        const ssize_t written = ::write(file, text.data(), text.size());
-        if (written < 0 && errno != EINTR) {
-            throw std::system_error(errno, std::generic_category(), "write");
-        }
-        text.remove_prefix(written < 0 ? 0 : static_cast<std::size_t>(written));
-    }
-}
-
-std::string readWhole(int file) {
-    std::string text;
-    std::array<char, 65536> piece{};
-    for (;;) {
-        const ssize_t got = ::read(file, piece.data(), piece.size());
-        if (got < 0 && errno != EINTR) {
-            throw std::system_error(errno, std::generic_category(), "read");
-        }
-        if (got == 0) {
-            return text;
-        }
-        text.append(piece.data(), got < 0 ? 0 : static_cast<std::size_t>(got));
-    }
-}
 
 void rewind(int file) {
     if (::lseek(file, 0, SEEK_SET) != 0) {
@@ -110,6 +75,8 @@ int runDot(int input, int output) {
 }  // namespace
 
 std::string drawSvg(const std::string& graphviz) {
+    // Files in place of pipes: whatever the sizes, neither program ever waits for the other
+    // to read.
     const ZR::UniqueFd input = memoryFile("graph");
     const ZR::UniqueFd output = memoryFile("picture");
     writeWhole(input.get(), graphviz);

@@ -60,9 +60,9 @@ std::string nameOf(const LeaseOverview& lease, const InterfaceOverview& interfac
            (lease.family.empty() ? "" : ", " + printable(lease.family)) + ')';
 }
 
-class Examination {
+class MachineExamination {
   public:
-    Examination(const MachineInterfaces& machine, std::int64_t now)
+    MachineExamination(const MachineInterfaces& machine, std::int64_t now)
         : machine_(machine), now_(now) {}
 
     std::vector<Finding> examine() {
@@ -156,7 +156,7 @@ class Examination {
 }  // namespace
 
 std::vector<Finding> machineFindings(const MachineInterfaces& machine, std::int64_t now) {
-    return Examination(machine, now).examine();
+    return MachineExamination(machine, now).examine();
 }
 
 }  // namespace cimdhcp

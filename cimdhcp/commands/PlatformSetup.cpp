@@ -1,12 +1,9 @@
 #include "commands/PlatformSetup.h"
 
 #include <fcntl.h>
-#include <sys/mman.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include <algorithm>
-#include <array>
 #include <cerrno>
 #include <cstddef>
 #include <cstdlib>
@@ -18,6 +15,7 @@
 #include <system_error>
 #include <utility>
 
+#include "commands/MemoryFile.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
 #include "zrclient/InstrumentationService.h"
@@ -53,49 +51,17 @@ Tree& tree() {
     throw Failure(ExitStatus::notLoaded, tree().name + ": " + std::strerror(error));
 }
 
-/// Everything up to the end.
-std::string readWhole(int fd) {
-    std::string content;
-    std::array<char, 65536> piece{};
-    for (;;) {
-        const ssize_t got = ::read(fd, piece.data(), piece.size());
-        if (got < 0 && errno == EINTR) {
-            continue;
-        }
-        if (got < 0) {
-            failWith(errno);
-        }
-        if (got == 0) {
-            return content;
-        }
-        content.append(piece.data(), static_cast<std::size_t>(got));
-        if (content.size() > largestTree) {
-            failWith(EFBIG);
-        }
-    }
-}
-
-void writeWhole(int fd, std::string_view content) {
-    while (!content.empty()) {
-        const ssize_t written = ::write(fd, content.data(), content.size());
-        if (written < 0 && errno != EINTR) {
-            failWith(errno);
-        }
-        content.remove_prefix(static_cast<std::size_t>(std::max<ssize_t>(written, 0)));
-    }
-}
-
 /// A file in memory with what can be read only once.
 std::string keepInMemory(int fd) {
-    const std::string content = readWhole(fd);
-    ZR::UniqueFd memory{::memfd_create("tree", MFD_CLOEXEC)};
-    if (!memory) {
-        failWith(errno);
+    try {
+        ZR::UniqueFd memory = memoryFile("tree");
+        writeWhole(memory.get(), readWhole(fd, largestTree));
+        std::string path = "/proc/self/fd/" + std::to_string(memory.get());
+        tree().memory = std::move(memory);
+        return path;
+    } catch (const std::system_error& error) {
+        failWith(error.code().value());
     }
-    writeWhole(memory.get(), content);
-    std::string path = "/proc/self/fd/" + std::to_string(memory.get());
-    tree().memory = std::move(memory);
-    return path;
 }
 
 /// Pipes, and devices such as terminals: what is read from them is gone.
