@@ -6,6 +6,8 @@ client_name=connman
 address_stays=yes
 tells_server=no
 follows_name=no
+# It lists no service for a link without a cable, and has it no more.
+without_cable=false
 # Without a server it soon takes an address of its own, and asks again after minutes.
 gives_up=yes
 in_client mkdir -p /var/lib/connman

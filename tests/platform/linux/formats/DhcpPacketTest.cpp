@@ -174,7 +174,8 @@ std::string option6(int code, const std::string& value) {
            value;
 }
 std::string address6(const std::string& lifetime) {
-    return option6(5, std::string(15, '\0') + '\1' + std::string(4, '\0') + lifetime);
+    std::string content(15, '\0');
+    return option6(5, content.append(1, '\1').append(4, '\0').append(lifetime));
 }
 const std::string header6{"\7abc"};
 
