@@ -312,7 +312,7 @@ TEST_F(NeighboursTest, EveryCallMayFailAndNoneIsFatal) {
     for (std::size_t i = 0; i < test::functionCount; ++i) {
         const auto function = static_cast<Function>(i);
         for (const Fault fault : {Fault::null, Fault::status, Fault::exception}) {
-            if (fault == Fault::null && !test::canAnswerNull(function)) {
+            if (fault == Fault::null && !test::canReturnNull(function)) {
                 continue;
             }
             for (unsigned call = 1;; ++call) {

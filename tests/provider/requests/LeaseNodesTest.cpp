@@ -33,7 +33,7 @@ class LeaseNodesTest : public ::testing::Test {
         std::filesystem::rename(directory_ / "next", directory_ / "tree.json");
     }
 
-    ScriptAnswer ask(const ScriptRequest& request) {
+    ScriptResponse ask(const ScriptRequest& request) {
         ZR::Testing::writeFile(directory_ / "ifcfg-eth0", "CONFIG_NAME=old\n");
         return host().run(request);
     }
@@ -82,13 +82,13 @@ Json withLeases(Json tree) {
 
 TEST_F(LeaseNodesTest, ChangeNothingForTheClasses) {
     const Json plain = Json::parse(TreeMachine::tree(1));
-    std::vector<ScriptAnswer> before;
+    std::vector<ScriptResponse> before;
     enter(plain);
     for (const ScriptRequest& request : script()) {
         before.push_back(ask(request));
     }
-    EXPECT_TRUE(std::any_of(before.begin(), before.end(), [](const ScriptAnswer& answer) {
-        return answer.objects.size() > 1;
+    EXPECT_TRUE(std::any_of(before.begin(), before.end(), [](const ScriptResponse& response) {
+        return response.objects.size() > 1;
     })) << "there is nothing to compare";
     enter(withLeases(plain));
     for (std::size_t i = 0; i < script().size(); ++i) {
