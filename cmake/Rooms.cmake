@@ -168,7 +168,8 @@ function(zr_test name)
                           GTest::gtest_main)
     target_compile_definitions(${name} PRIVATE ZR_SOURCE_DIR="${PROJECT_SOURCE_DIR}"
                                ZR_BINARY_DIR="${PROJECT_BINARY_DIR}")
-    set(properties TIMEOUT 120)
+    # Twice the weight of those that mostly wait, of which so many more run at once.
+    set(properties TIMEOUT 120 PROCESSORS 2)
     if(TEST_SERIAL)
         list(APPEND properties RUN_SERIAL TRUE)
     endif()

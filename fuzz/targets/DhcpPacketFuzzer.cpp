@@ -2,6 +2,8 @@
 #include "formats/DhcpPacket.h"
 
 #include <algorithm>
+#include <optional>
+#include <utility>
 
 #include "Input.h"
 #include "support/Addresses.h"
@@ -37,6 +39,12 @@ Message written(const ZR::Live::DhcpReply& reply, bool split) {
         append(message, {51, 4});
         appendNumber(message, *reply.leaseTime, 4);
     }
+    for (const auto& [code, time] : {std::pair{58, reply.renewal}, {59, reply.rebinding}}) {
+        if (time) {
+            append(message, {static_cast<std::uint8_t>(code), 4});
+            appendNumber(message, *time, 4);
+        }
+    }
     if (reply.server) {
         const Message server = fuzz::addressBytes(*reply.server);
         if (split) {
@@ -54,13 +62,28 @@ Message written(const ZR::Live::Dhcp6Reply& reply) {
     Message message{7, 0, 0, 1};
     for (const auto& address : reply.addresses) {
         append(message, {0, 3, 0, 40});  // IA_NA with one IAADDR (RFC 8415, 21.4 and 21.6)
-        message.insert(message.end(), 12, 0);
+        appendNumber(message, 0, 4);
+        appendNumber(message, address.renewal.value_or(0), 4);
+        appendNumber(message, address.rebinding.value_or(0), 4);
         append(message, {0, 5, 0, 24});
         append(message, fuzz::addressBytes(address.address));
         appendNumber(message, 0, 4);
         appendNumber(message, address.validLifetime, 4);
     }
     return message;
+}
+
+/// What the least message says: others have more options, and options with other content.
+template <typename Reply>
+std::optional<Reply> leastOf(const ZR::Live::Parsed<Reply>& parsed) {
+    const Reply* const reply = std::get_if<Reply>(&parsed);
+    if (reply == nullptr) {
+        return std::nullopt;
+    }
+    Reply least = *reply;
+    least.options.clear();
+    least.clientIdentifier.clear();
+    return least;
 }
 
 template <typename Reply>
@@ -80,9 +103,9 @@ void check4(const std::uint8_t* data, std::size_t size) {
     for (const bool split : {false, true}) {
         Message message = written(*reply, split);
         append(message, {1, 2, 3});  // behind the end nothing counts
-        fuzz::require(
-            ZR::Live::parseDhcpReply(fuzz::bytes(message.data(), message.size())) == parsed,
-            "a reply survives being written");
+        fuzz::require(leastOf(ZR::Live::parseDhcpReply(
+                          fuzz::bytes(message.data(), message.size()))) == leastOf(parsed),
+                      "a reply survives being written");
     }
 }
 
@@ -93,7 +116,8 @@ void check6(const std::uint8_t* data, std::size_t size) {
         return;
     }
     const Message message = written(*reply);
-    fuzz::require(ZR::Live::parseDhcp6Reply(fuzz::bytes(message.data(), message.size())) == parsed,
+    fuzz::require(leastOf(ZR::Live::parseDhcp6Reply(fuzz::bytes(message.data(), message.size()))) ==
+                      leastOf(parsed),
                   "a DHCPv6 reply survives being written");
 }
 

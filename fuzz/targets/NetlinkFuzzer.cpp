@@ -72,6 +72,9 @@ Message written(const Link& link) {
     if (link.carrier) {
         appendNumber(message, IFLA_CARRIER, static_cast<std::uint8_t>(*link.carrier ? 1 : 0));
     }
+    if (link.farNamespace) {
+        appendNumber(message, IFLA_LINK_NETNSID, *link.farNamespace);
+    }
     if (link.hasParentDevice) {
         appendText(message, IFLA_PARENT_DEV_NAME, "virtio0");
     }

@@ -1,6 +1,7 @@
 #include "Machine.h"
 
 #include <linux/if.h>
+#include <linux/rtnetlink.h>
 
 #include <algorithm>
 #include <set>
@@ -88,6 +89,17 @@ bool speaksItself(const ClientProcess& process, const InterfaceView& view) {
                            return management->client == process.client &&
                                   (process.ipv6 ? management->dhcp6 : management->dhcp4);
                        });
+}
+
+/// Whether a dhcpcd has an address that it was told (its option -S). It gives those without an
+/// end, has no lease of them, and does not listen on the link for a server's.
+bool wasToldAddress(const ClientProcess& process, const InterfaceView& view) {
+    return process.client == Client::Dhcpcd && !process.ipv6 && view.leases.empty() &&
+           view.isHeardBy(process) == false &&
+           std::any_of(view.addresses.begin(), view.addresses.end(), [](const Address& each) {
+               return each.ip.isIPv4() && each.scope == RT_SCOPE_UNIVERSE &&
+                      each.validLifetime == Address::infinite;
+           });
 }
 
 }  // namespace
@@ -205,7 +217,7 @@ void Machine::collectManagements() {
 void Machine::addProcess(const ClientProcess& process, InterfaceView& view) const {
     const bool known =
         std::find(view.processes.begin(), view.processes.end(), &process) != view.processes.end();
-    if (!known && !speaksItself(process, view)) {
+    if (!known && !speaksItself(process, view) && !wasToldAddress(process, view)) {
         view.processes.push_back(&process);
     }
 }
@@ -306,7 +318,9 @@ void Machine::findNextChange() {
         for (const auto* leases : {&view.leases, &view.leases6}) {
             for (const Lease* lease : *leases) {
                 consider(lease->expires);
-                consider(lease->rebinds);
+                if (lease->clientAlive) {
+                    consider(lease->rebinds);
+                }
             }
         }
     }

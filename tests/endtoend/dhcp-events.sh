@@ -27,6 +27,7 @@ tells_server=yes      # whether anything tells the server
 gives_up=no           # whether it soon takes an address of its own where no server is
 address_stays=no      # whether its address stays when it is killed and the lease ends
 without_cable=true    # DHCPEnabled when the cable is out and the address gone
+file_found=yes        # whether its lease file is found when it does not run
 drops_address=yes     # whether it takes its address away when the cable is out
 loses_name=no         # whether nothing ties it to its link then
 follows_name=yes      # whether it goes on when its link gets another name
@@ -148,7 +149,7 @@ life() {
         if [[ $loses_name == no ]]; then
             bound "under another name" 198.51.100.2
         else
-            truth "under another name" enabled='@(true|unknown)' source='@(1|none)'
+            truth "under another name" enabled=unknown source=0
         fi
         current=eth1
         truth "its former name" link=no
@@ -199,9 +200,10 @@ end() {
     ended=$((SECONDS + 20))
     kill_processes KILL "${processes[@]}"
     # Who has seen the file of a manager that does not run cannot tell whose the server was.
-    truth "killed while the lease runs" \
-        "$(if [[ $address_stays == no ]]; then echo enabled=true; else echo link=yes; fi)" \
-        "$(if [[ $address_stays == no ]]; then echo source=1; else echo link=yes; fi)"
+    local facts=(enabled=true source=1)
+    [[ $address_stays == no ]] || facts=(link=yes)
+    [[ $file_found == yes ]] || facts=(enabled=unknown source=0)
+    truth "killed while the lease runs" "${facts[@]}"
     sleep $((ended - SECONDS + 1))
     if no_address "$current"; then
         nothing "killed, and the lease has ended"

@@ -21,34 +21,22 @@ namespace {
 // Plain, so that it is there from the first instruction of a thread to its last.
 thread_local SystemCalls* current = nullptr;
 
-constexpr std::array<const char*, static_cast<std::size_t>(Call::count)> names{"access",
-                                                                               "bind",
-                                                                               "close",
-                                                                               "fallocate",
-                                                                               "fstat",
-                                                                               "ftruncate",
-                                                                               "gethostname",
-                                                                               "getsockname",
-                                                                               "inotify_add_watch",
-                                                                               "inotify_init1",
-                                                                               "inotify_rm_watch",
-                                                                               "ioctl",
-                                                                               "open",
-                                                                               "openat",
-                                                                               "opendir",
-                                                                               "poll",
-                                                                               "pwrite",
-                                                                               "read",
-                                                                               "readdir",
-                                                                               "readlink",
-                                                                               "readlinkat",
-                                                                               "recv",
-                                                                               "recvmsg",
-                                                                               "sendto",
-                                                                               "socket",
-                                                                               "stat",
-                                                                               "syscall",
-                                                                               "write"};
+constexpr std::array<const char*, static_cast<std::size_t>(Call::count)> names{
+    "access",        "bind",
+    "close",         "fallocate",
+    "fstat",         "fstatat",
+    "ftruncate",     "gethostname",
+    "getsockname",   "inotify_add_watch",
+    "inotify_init1", "inotify_rm_watch",
+    "ioctl",         "lstat",
+    "open",          "openat",
+    "opendir",       "poll",
+    "pwrite",        "read",
+    "readdir",       "readlink",
+    "readlinkat",    "recv",
+    "recvmsg",       "sendto",
+    "socket",        "stat",
+    "syscall",       "write"};
 
 }  // namespace
 
@@ -202,6 +190,10 @@ ZR_REPLACES int fallocate(int fd, int mode, off_t offset, off_t size) {
 ZR_REPLACES int fstat(int fd, struct stat* status) noexcept {
     return meet(Call::fstat, ZR_CALLER, -1, kernel(SYS_fstat, fd, status));
 }
+ZR_REPLACES int fstatat(int directory, const char* path, struct stat* status, int flags) noexcept {
+    static const auto real = next<int (*)(int, const char*, struct stat*, int)>("fstatat");
+    return meet(Call::fstatat, ZR_CALLER, -1, [&] { return real(directory, path, status, flags); });
+}
 ZR_REPLACES int ftruncate(int fd, off_t size) noexcept {
     return meet(Call::ftruncate, ZR_CALLER, -1, kernel(SYS_ftruncate, fd, size));
 }
@@ -228,6 +220,10 @@ ZR_REPLACES int ioctl(int fd, unsigned long request, ...) noexcept {
     void* const argument = va_arg(rest, void*);
     va_end(rest);
     return meet(Call::ioctl, ZR_CALLER, -1, kernel(SYS_ioctl, fd, request, argument));
+}
+ZR_REPLACES int lstat(const char* path, struct stat* status) noexcept {
+    static const auto real = next<int (*)(const char*, struct stat*)>("lstat");
+    return meet(Call::lstat, ZR_CALLER, -1, [&] { return real(path, status); });
 }
 ZR_REPLACES int open(const char* path, int flags, ...) {
     va_list rest;

@@ -97,10 +97,10 @@ cat >"$directory/expected" <<'TEXT'
 ExecStart=/usr/bin/cimdhcp serve --read-only
 == use
 root 755
-INTERFACE  DHCP  STATE   ADDRESS        SERVERS                 CONFIGURATION NAME
-eth0       on    bound   192.0.2.17     192.0.2.1, 2001:db8::1  old
-wlan0      on    bound   198.51.100.23  198.51.100.1            -
-eth1       off   active  203.0.113.4    -                       -
+INTERFACE  DHCP  STATE  CLIENT          ADDRESS        EXPIRES     SERVERS                 CONFIGURATION NAME
+eth0       on    bound  dhclient        192.0.2.17     2100-01-01  192.0.2.1, 2001:db8::1  old
+wlan0      on    bound  NetworkManager  198.51.100.23  never       198.51.100.1            -
+eth1       off   off    -               203.0.113.4    -           -                       -
 eth0: the configuration name is now "new", was "old" (/var/lib/dhcp-client-provider/ifcfg-eth0).
 CONFIG_NAME=new
 15

@@ -127,7 +127,7 @@ class TreeReader {
                 break;
             case Slot::property:
                 lookAtText(value);
-                set(isReadable(value) ? PropertyValue(expanded(value)) : PropertyValue());
+                set(valueOf(value));
                 break;
             case Slot::propertyEntry:
                 lookAtText(value);
@@ -340,13 +340,22 @@ class TreeReader {
         }
     }
 
+    [[nodiscard]] PropertyValue valueOf(const std::string& text) const {
+        if (!isReadable(text)) {
+            return {};
+        }
+        return expanded(text);
+    }
+
     /// The list that was read: of texts, or of numbers; a mixed one cannot be read.
     [[nodiscard]] PropertyValue takeList() {
         if (!listIsReadable_) {
             return {};
         }
-        return numbers_.empty() ? PropertyValue(std::exchange(list_, {}))
-                                : PropertyValue(std::exchange(numbers_, {}));
+        if (numbers_.empty()) {
+            return std::exchange(list_, {});
+        }
+        return std::exchange(numbers_, {});
     }
 
     /// Takes a value that is not a text, if any such may stand in the slot.
