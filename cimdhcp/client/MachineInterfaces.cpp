@@ -89,9 +89,8 @@ LeaseOverview leaseOf(const ZR::Snapshot& snapshot, ZR::Snapshot::Index node) {
     lease.renews = momentOf(snapshot, node, Properties::RenewalTime);
     lease.rebinds = momentOf(snapshot, node, Properties::RebindingTime);
     lease.expires = momentOf(snapshot, node, Properties::LeaseExpires);
-    if (const auto* options =
-            read<std::vector<std::uint64_t>>(snapshot, node, Properties::OptionsReceived)) {
-        lease.options = *options;
+    if (const auto* options = read<ZR::NumberList>(snapshot, node, Properties::OptionsReceived)) {
+        lease.options = options->numbers;
     }
     lease.clientIdentifier = textOf(snapshot, node, Properties::ClientIdentifier);
     lease.client = textOf(snapshot, node, Properties::Client);

@@ -90,12 +90,9 @@ std::shared_ptr<const Snapshot> decide(const Machine& machine, Explain explain) 
     }
     const auto computer =
         builder.add(Snapshot::none, "ComputerSystem", NodeLexicon::hostDescription);
-    // In a conditional expression g++ 12 would destroy a value whose making has failed.
-    PropertyValue name;
-    if (!machine.hostName().empty()) {
-        name = machine.hostName();
-    }
-    builder.property(Properties::Name, std::move(name));
+    builder.property(Properties::Name, machine.hostName().empty()
+                                           ? PropertyValue()
+                                           : PropertyValue(machine.hostName()));
     builder.property(Properties::NameMaxLength, hostNameMaxLength);
     const auto network = builder.add(computer, "Network", "Network");
     std::vector<Diagnostic> diagnostics = machine.diagnostics();

@@ -79,8 +79,7 @@ class LeaseNode {
     }
     void options(const std::vector<std::uint16_t>& codes) {
         if (!codes.empty()) {
-            add(Properties::OptionsReceived,
-                std::vector<std::uint64_t>(codes.begin(), codes.end()));
+            add(Properties::OptionsReceived, NumberList{{codes.begin(), codes.end()}});
         }
     }
     void process(std::int32_t pid) {

@@ -18,6 +18,8 @@ Json valueOf(const PropertyValue& value) {
         [](const auto& content) {
             if constexpr (std::is_same_v<std::decay_t<decltype(content)>, std::monostate>) {
                 return Json(nullptr);
+            } else if constexpr (std::is_same_v<std::decay_t<decltype(content)>, NumberList>) {
+                return Json(content.numbers);
             } else {
                 return Json(content);
             }

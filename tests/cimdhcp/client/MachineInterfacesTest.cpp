@@ -148,7 +148,7 @@ TEST_F(LeasesOfATree, HaveAllThatTheirNodesHave) {
     builder_.property(Properties::RenewalTime, std::uint64_t{200});
     builder_.property(Properties::RebindingTime, std::uint64_t{300});
     builder_.property(Properties::LeaseExpires, std::uint64_t{400});
-    builder_.property(Properties::OptionsReceived, std::vector<std::uint64_t>{23, 24});
+    builder_.property(Properties::OptionsReceived, ZR::NumberList{{23, 24}});
     builder_.property(Properties::ClientIdentifier, std::string("00:01"));
     builder_.property(Properties::Client, std::string("dhclient"));
     builder_.property(Properties::Process, std::uint64_t{17});

@@ -118,21 +118,20 @@ TEST_F(LeaseNodesTest, ALeaseTellsAllThatItsFileSays) {
     const auto property = [](Properties id, PropertyValue value) {
         return SnapshotProperty{id, false, std::move(value)};
     };
-    EXPECT_THAT(
-        nodes(),
-        ElementsAre(ElementsAre(
-            property(Properties::Family, "IPv4"),
-            property(Properties::ClientState, state(ClientState::Bound)),
-            property(Properties::Address, "192.0.2.7"),
-            property(Properties::ServerAddress, "192.0.2.1"),
-            property(Properties::LeaseObtained, time(now - 600)),
-            property(Properties::RenewalTime, time(now)),
-            property(Properties::RebindingTime, time(now + 450)),
-            property(Properties::LeaseExpires, time(now + 600)),
-            property(Properties::OptionsReceived, std::vector<std::uint64_t>{1, 3, 51, 54}),
-            property(Properties::ClientIdentifier, "1:52:54:0:ab:cd:ef"),
-            property(Properties::Client, "dhclient"), property(Properties::Process, number(17)),
-            property(Properties::Source, "/var/lib/dhcp/dhclient.leases"))));
+    EXPECT_THAT(nodes(), ElementsAre(ElementsAre(
+                             property(Properties::Family, "IPv4"),
+                             property(Properties::ClientState, state(ClientState::Bound)),
+                             property(Properties::Address, "192.0.2.7"),
+                             property(Properties::ServerAddress, "192.0.2.1"),
+                             property(Properties::LeaseObtained, time(now - 600)),
+                             property(Properties::RenewalTime, time(now)),
+                             property(Properties::RebindingTime, time(now + 450)),
+                             property(Properties::LeaseExpires, time(now + 600)),
+                             property(Properties::OptionsReceived, NumberList{{1, 3, 51, 54}}),
+                             property(Properties::ClientIdentifier, "1:52:54:0:ab:cd:ef"),
+                             property(Properties::Client, "dhclient"),
+                             property(Properties::Process, number(17)),
+                             property(Properties::Source, "/var/lib/dhcp/dhclient.leases"))));
     const auto node = tree_->first(NodeType::DHCPLease);
     EXPECT_EQ(tree_->origin(node, Properties::Address),
               "dhclient, process 17 /var/lib/dhcp/dhclient.leases: a live lease");

@@ -76,6 +76,8 @@ TEST_F(MachineTest, ItChangesByItselfWhenTheFirstLeaseEndsOrIsReboundNext) {
     facts_.clients.leases = {lease("eth2", "192.0.2.2"), lease("eth3", "192.0.2.3")};
     EXPECT_EQ(machine().changesAt(), now + 600);
     facts_.clients.leases[1].rebinds = now + 525;
+    EXPECT_EQ(machine().changesAt(), now + 600) << "no client runs that would ask others";
+    facts_.clients.leases[1].clientAlive = true;
     EXPECT_EQ(machine().changesAt(), now + 525);
     facts_.clients.leases[1].rebinds = now;
     EXPECT_EQ(machine().changesAt(), now + 600);

@@ -112,7 +112,7 @@ TEST(JsonTree, AListHoldsTextsOrNumbers) {
     const auto listOf = [](const char* json) {
         return parsed(withProperty(json))->find(0, Properties::IPv4Address)->value;
     };
-    EXPECT_EQ(listOf("[54, 1]"), PropertyValue(std::vector<std::uint64_t>{54, 1}));
+    EXPECT_EQ(listOf("[54, 1]"), PropertyValue(NumberList{{54, 1}}));
     EXPECT_EQ(listOf("[]"), PropertyValue(std::vector<std::string>{}));
     EXPECT_EQ(listOf(R"([54, "1"])"), PropertyValue());
     EXPECT_EQ(listOf(R"(["1", 54])"), PropertyValue());

@@ -25,7 +25,7 @@ std::shared_ptr<const Snapshot> everyKind() {
     const auto twin = builder.add(network, "NetworkInterface", "twin");
     builder.add(twin, "DHCPLease", "DHCP lease");
     builder.property(Properties::LeaseExpires, NodeLexicon::never);
-    builder.property(Properties::OptionsReceived, std::vector<std::uint64_t>{1, 54, 119});
+    builder.property(Properties::OptionsReceived, NumberList{{1, 54, 119}});
     builder.add(twin, "NetworkInterface", "below");
     builder.property(Properties::DHCPServerAddresses, std::vector<std::string>{});
     builder.add(network, "NetworkInterface", "twin");

@@ -15,10 +15,19 @@
 
 namespace ZR {
 
+/// A list of numbers as a value. A type of its own: libstdc++ 12 takes a variant of texts
+/// and lists alone for one that is never without a value, and destroys one whose copying
+/// failed for lack of memory as if it had one.
+struct NumberList {
+    std::vector<std::uint64_t> numbers;
+
+    bool operator==(const NumberList&) const = default;
+};
+
 /// The value of one property. std::monostate is a value that no reader can
 /// take: the property is present (isPropertyReadOnly finds it) but unreadable.
 using PropertyValue = std::variant<std::monostate, bool, std::uint64_t, std::string,
-                                   std::vector<std::string>, std::vector<std::uint64_t>>;
+                                   std::vector<std::string>, NumberList>;
 
 struct SnapshotProperty {
     NodeLexicon::Properties id{};

@@ -101,7 +101,7 @@ class TreeReader {
         lookAtKind(JsonKind::number);
         if (next() == Slot::propertyEntry) {
             listIsReadable_ = listIsReadable_ && list_.empty();
-            numbers_.push_back(value);
+            numbers_.numbers.push_back(value);
             return passed(1);
         }
         if (next() == Slot::property) {
@@ -127,11 +127,11 @@ class TreeReader {
                 break;
             case Slot::property:
                 lookAtText(value);
-                set(valueOf(value));
+                set(isReadable(value) ? PropertyValue(expanded(value)) : PropertyValue());
                 break;
             case Slot::propertyEntry:
                 lookAtText(value);
-                listIsReadable_ = listIsReadable_ && numbers_.empty() && isReadable(value);
+                listIsReadable_ = listIsReadable_ && numbers_.numbers.empty() && isReadable(value);
                 list_.push_back(expanded(value));
                 break;
             case Slot::readOnlyEntry:
@@ -207,7 +207,7 @@ class TreeReader {
         switch (slot) {
             case Slot::property:
                 list_.clear();
-                numbers_.clear();
+                numbers_.numbers.clear();
                 listIsReadable_ = true;
                 [[fallthrough]];
             case Slot::nodes:
@@ -340,19 +340,12 @@ class TreeReader {
         }
     }
 
-    [[nodiscard]] PropertyValue valueOf(const std::string& text) const {
-        if (!isReadable(text)) {
-            return {};
-        }
-        return expanded(text);
-    }
-
     /// The list that was read: of texts, or of numbers; a mixed one cannot be read.
     [[nodiscard]] PropertyValue takeList() {
         if (!listIsReadable_) {
             return {};
         }
-        if (numbers_.empty()) {
+        if (numbers_.numbers.empty()) {
             return std::exchange(list_, {});
         }
         return std::exchange(numbers_, {});
@@ -455,7 +448,7 @@ class TreeReader {
     Slot slot_ = Slot::ignored;
     NodeLexicon::Properties property_{};
     std::vector<std::string> list_;
-    std::vector<std::uint64_t> numbers_;
+    NumberList numbers_;
     bool listIsReadable_ = true;
     unsigned nodeDepth_ = 0;
     unsigned ignoredDepth_ = 0;

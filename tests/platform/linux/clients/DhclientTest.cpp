@@ -408,8 +408,8 @@ TEST(DhclientProcessFiles, OfARealKernel) {
             if (child == 0) {
                 const bool done = ::unshare(kinds) == 0 && ::chroot(root) == 0 &&
                                   ::chdir(directory) == 0 && ::write(ready[1], "y", 1) == 1;
-                for (; done;) {
-                    ::pause();
+                if (done) {
+                    ::pause();  // until it is killed
                 }
                 ::_exit(1);
             }
