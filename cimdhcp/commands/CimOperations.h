@@ -8,6 +8,11 @@ namespace cimdhcp {
 
 class Client;
 
+/// The one class whose instances the provider changes, and the one property of it that
+/// the provider looks at, whatever else the standard's class lets a client write.
+inline constexpr const char* settingClass = "QVXZR_DHCPSettingData";
+inline constexpr const char* nameProperty = "ConfigurationName";
+
 /// One CIM operation that was carried out, whatever the status of its response.
 struct CimOperation {
     cimom::ObjectPath path;  ///< of the class or instance that was asked for

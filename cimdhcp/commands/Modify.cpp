@@ -20,11 +20,6 @@ namespace cimdhcp {
 
 namespace {
 
-/// The one class whose instances the provider changes, and the one property of it that
-/// the provider looks at, whatever else the standard's class lets a client write.
-constexpr std::string_view settingClass = "QVXZR_DHCPSettingData";
-constexpr std::string_view nameProperty = "ConfigurationName";
-
 std::pair<std::string, std::string> splitAssignment(const std::string& text) {
     const std::size_t sign = text.find('=');
     if (sign == std::string::npos || sign == 0) {

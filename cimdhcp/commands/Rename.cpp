@@ -9,6 +9,7 @@
 #include "client/Client.h"
 #include "client/MachineInterfaces.h"
 #include "client/Response.h"
+#include "commands/CimOperations.h"
 #include "commands/RenameFiles.h"
 #include "commands/RenameRefusals.h"
 #include "text/DisplayText.h"
@@ -22,9 +23,6 @@
 namespace cimdhcp {
 
 namespace {
-
-constexpr const char* settingClass = "QVXZR_DHCPSettingData";
-constexpr const char* nameProperty = "ConfigurationName";
 
 /// The setting of one interface.
 struct Setting {
