@@ -87,8 +87,8 @@ class Execution {
   private:
     /// `table` and `json` make the text of rows; a table has a width and a style, too.
     template <typename Row, typename TableText, typename JsonText>
-    std::string list(const std::vector<Column<Row>>& columns, std::vector<Row> rows,
-                     const TableText& table, const JsonText& json) const {
+    [[nodiscard]] std::string list(const std::vector<Column<Row>>& columns, std::vector<Row> rows,
+                                   const TableText& table, const JsonText& json) const {
         if (presentation_.sort) {
             sortBy(*presentation_.sort, columns, rows);
         }

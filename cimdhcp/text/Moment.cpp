@@ -19,7 +19,7 @@ constexpr std::array<Unit, 4> units{
     {{1, 119, "s"}, {60, 119, "min"}, {3600, 47, "h"}, {86400, 100, "d"}}};
 
 constexpr std::int64_t firstMoment = 0;
-constexpr std::int64_t lastMoment = 253'402'300'799;   // 9999-12-31T23:59:59Z
+constexpr std::int64_t lastMoment = 253'402'300'799;  // 9999-12-31T23:59:59Z
 
 }  // namespace
 

@@ -97,7 +97,7 @@ class Snapshot {
     std::vector<SnapshotProperty> properties_;
     std::vector<std::string> origins_;  // of the properties in their order; may be fewer
     std::vector<Diagnostic> diagnostics_;
-    std::array<Index, NodeLexicon::nodeTypes.size()> firstOfType_;  // in the lexicon's order
+    std::array<Index, NodeLexicon::nodeTypes.size()> firstOfType_{};  // in the lexicon's order
 };
 
 /// Builds a snapshot in document order: add a node after its parent and before
