@@ -129,7 +129,7 @@ void readDevices(const Roots& roots, const std::vector<ProfileFile>& profiles, C
         if (alive && device.managed) {
             addManagement(*ifindex, device, path, timeOf(path), profiles, facts);
         }
-        for (auto& lease :
+        for (const auto& lease :
              {networkManagerLease4(device.options4), networkManagerLease6(device.options6)}) {
             if (lease) {
                 Lease& added = facts.leases.emplace_back(*lease);
