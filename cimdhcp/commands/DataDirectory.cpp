@@ -41,9 +41,10 @@ class Refusals {
   public:
     void tryAccess(const fs::path& path, int mode) {
         if (::access(path.c_str(), mode) != 0) {
+            const int error = errno;  // making texts may change it
             ++count_;
             if (first_.empty()) {
-                first_ = printable(path.filename().string()) + ": " + std::strerror(errno);
+                first_ = printable(path.filename().string()) + ": " + std::strerror(error);
             }
         }
     }
@@ -79,8 +80,9 @@ Finding contentOf(const std::string& directory) {
     }
     std::string refused = reading.text("read") + writing.text("change");
     if (::access(directory.c_str(), W_OK) != 0) {
+        const int error = errno;
         refused +=
-            std::string("; this user may not make files there (") + std::strerror(errno) + ")";
+            std::string("; this user may not make files there (") + std::strerror(error) + ")";
     }
     return {refused.empty() ? Verdict::good : Verdict::notable, what,
             printable(directory) + " has " + counted(files, "ifcfg file", "ifcfg files") + refused,
