@@ -80,9 +80,9 @@ Finding contentOf(const std::string& directory) {
     }
     std::string refused = reading.text("read") + writing.text("change");
     if (::access(directory.c_str(), W_OK) != 0) {
-        const int error = errno;
+        const int reason = errno;
         refused +=
-            std::string("; this user may not make files there (") + std::strerror(error) + ")";
+            std::string("; this user may not make files there (") + std::strerror(reason) + ")";
     }
     return {refused.empty() ? Verdict::good : Verdict::notable, what,
             printable(directory) + " has " + counted(files, "ifcfg file", "ifcfg files") + refused,
