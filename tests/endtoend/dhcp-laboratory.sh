@@ -156,6 +156,41 @@ kernel_address() {
 write_in_client() {
     in_client sh -c 'mkdir -p "$(dirname "$1")" && cat >"$1"' sh "$1"
 }
+# prepare_networkmanager MAIN IPV4 IPV6: its settings and its one profile, of eth1; each
+# argument is the text of such a section, or a part of it.
+prepare_networkmanager() {
+    in_client mkdir -p /run/NetworkManager/conf.d /var/lib/NetworkManager
+    write_in_client /run/NetworkManager/laboratory.conf <<FILE
+[main]
+plugins=keyfile
+no-auto-default=*
+dns=none
+rc-manager=unmanaged
+$1
+FILE
+    write_in_client /etc/NetworkManager/system-connections/office.nmconnection <<FILE
+[connection]
+id=office
+uuid=11111111-2222-4333-8444-555555555555
+type=ethernet
+interface-name=eth1
+[ipv4]
+$2
+[ipv6]
+$3
+FILE
+    # It takes no profile that others may read.
+    in_client chmod 600 /etc/NetworkManager/system-connections/office.nmconnection
+}
+# activate_networkmanager: starts it where it does not run, and its profile.
+activate_networkmanager() {
+    if ! is_running NetworkManager; then
+        background NetworkManager --no-daemon --config /run/NetworkManager/laboratory.conf \
+            --config-dir /run/NetworkManager/conf.d
+        eventually in_client nmcli general status
+    fi
+    eventually in_client nmcli --wait 0 connection up office
+}
 # background COMMAND...: runs a command on the client's machine, and does not wait for it.
 background() {
     in_client "$@" </dev/null >>"$work/client.log" 2>&1 &

@@ -90,34 +90,8 @@ FILE
         processes=(NetworkManager)
         client_name=NetworkManager
         managed=yes
-        in_client mkdir -p /run/NetworkManager/conf.d /var/lib/NetworkManager
-        write_in_client /run/NetworkManager/laboratory.conf <<'FILE'
-[main]
-plugins=keyfile
-no-auto-default=*
-dns=none
-rc-manager=unmanaged
-FILE
-        write_in_client /etc/NetworkManager/system-connections/office.nmconnection <<'FILE'
-[connection]
-id=office
-uuid=11111111-2222-4333-8444-555555555555
-type=ethernet
-interface-name=eth1
-[ipv4]
-method=disabled
-[ipv6]
-method=dhcp
-FILE
-        in_client chmod 600 /etc/NetworkManager/system-connections/office.nmconnection
-        start_client() {
-            if ! is_running NetworkManager; then
-                background NetworkManager --no-daemon --config /run/NetworkManager/laboratory.conf \
-                    --config-dir /run/NetworkManager/conf.d
-                eventually in_client nmcli general status
-            fi
-            eventually in_client nmcli --wait 0 connection up office
-        }
+        prepare_networkmanager "" method=disabled method=dhcp
+        start_client() { activate_networkmanager; }
         stop_client() { in_client nmcli connection down office >>"$work/client.log" 2>&1; }
         start_bus
         ;;

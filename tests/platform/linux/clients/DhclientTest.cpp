@@ -337,7 +337,7 @@ TEST_F(DhclientTest, OnlyTheClientThatKeepsTheFileIsBehindItsLeases) {
 class RelativeDhclientTest : public DhclientTest {
   protected:
     RelativeDhclientTest() {
-        root_.write("/work/own.db", lease("eth1", "192.0.2.7", "192.0.2.1"));
+        root_.write("/srv/own.db", lease("eth1", "192.0.2.7", "192.0.2.1"));
         std::filesystem::create_directories(root_.path("/proc/17"));
     }
     void link(const std::string& name, const std::string& target) const {
@@ -355,16 +355,16 @@ class RelativeDhclientTest : public DhclientTest {
 };
 
 TEST_F(RelativeDhclientTest, BeginsInTheWorkingDirectory) {
-    link("cwd", root_.path("/work"));
-    for (const char* name : {"own.db", "./own.db", "../work/own.db"}) {
+    link("cwd", root_.path("/srv"));
+    for (const char* name : {"own.db", "./own.db", "../srv/own.db"}) {
         const ClientFacts facts = readOf(name);
         ASSERT_EQ(facts.leases.size(), 1U) << name;
         EXPECT_TRUE(facts.leases[0].clientAlive);
-        EXPECT_EQ(facts.leases[0].origin, root_.path("/work/") + name);
+        EXPECT_EQ(facts.leases[0].origin, root_.path("/srv/") + name);
     }
     EXPECT_THAT(
         readOf("own.db").places,
-        testing::Contains(WatchedPlace{.directory = root_.path("/work"), .namePrefix = "own.db"}));
+        testing::Contains(WatchedPlace{.directory = root_.path("/srv"), .namePrefix = "own.db"}));
 }
 
 TEST_F(RelativeDhclientTest, OfAProcessThatHasEndedNothingIsKnown) {
@@ -375,7 +375,7 @@ TEST_F(RelativeDhclientTest, OfAProcessThatHasEndedNothingIsKnown) {
 }
 
 TEST_F(RelativeDhclientTest, ADirectoryThatIsGoneIsToldAndNotGuessed) {
-    link("cwd", root_.path("/work (deleted)"));
+    link("cwd", root_.path("/srv (deleted)"));
     const ClientFacts facts = readOf("own.db");
     EXPECT_THAT(facts.leases, IsEmpty());
     EXPECT_THAT(
@@ -386,11 +386,11 @@ TEST_F(RelativeDhclientTest, ADirectoryThatIsGoneIsToldAndNotGuessed) {
 }
 
 TEST_F(RelativeDhclientTest, BeginsBelowTheRootOfTheProcess) {
-    // As of a process that changed its root to another one and works in its /work.
-    root_.write("/jail/work/own.db", lease("eth1", "192.0.2.7", "192.0.2.2"));
+    // As of a process that changed its root to another one and works in its /srv.
+    root_.write("/jail/srv/own.db", lease("eth1", "192.0.2.7", "192.0.2.2"));
     root_.write("/jail/etc/whole.db", lease("eth1", "192.0.2.7", "192.0.2.3"));
     link("root", root_.path("/jail"));
-    link("cwd", root_.path("/jail/work"));
+    link("cwd", root_.path("/jail/srv"));
     EXPECT_THAT(servers(readOf("own.db")), ElementsAre("192.0.2.2"_ip));
     EXPECT_THAT(servers(readOf("/etc/whole.db")), ElementsAre("192.0.2.3"_ip));
 }
@@ -398,8 +398,8 @@ TEST_F(RelativeDhclientTest, BeginsBelowTheRootOfTheProcess) {
 TEST(DhclientProcessFiles, OfARealKernel) {
     ZR_NEEDS_NAMESPACES();
     EXPECT_TRUE(passesInNamespaces(30, [] {
-        run("mkdir -p /run/jail/work /run/work && echo here > /run/work/own.db && "
-            "echo jailed > /run/jail/work/own.db && ln -s /work/own.db /run/jail/work/link.db");
+        run("mkdir -p /run/jail/srv /run/srv && echo here > /run/srv/own.db && "
+            "echo jailed > /run/jail/srv/own.db && ln -s /srv/own.db /run/jail/srv/link.db");
         const auto contentFor = [](const char* root, const char* directory, const char* path,
                                    int kinds) {
             std::array<int, 2> ready{};
@@ -433,13 +433,13 @@ TEST(DhclientProcessFiles, OfARealKernel) {
             ::waitpid(child, nullptr, 0);
             return content;
         };
-        EXPECT_EQ(contentFor("/", "/run/work", "own.db", 0), "here\n");
-        EXPECT_EQ(contentFor("/run/jail", "/work", "own.db", 0), "jailed\n");
-        EXPECT_EQ(contentFor("/run/jail", "/work", "/work/own.db", 0), "jailed\n");
-        EXPECT_EQ(contentFor("/run/jail", "/work", "/work/link.db", 0), "jailed\n");
-        EXPECT_EQ(contentFor("/", "/run/work", "own.db", CLONE_NEWNS), "here\n");
-        EXPECT_EQ(contentFor("/", "/run/work", "/run/work/own.db", CLONE_NEWNS), "here\n");
-        EXPECT_EQ(contentFor("/", "/run/work", "none.db", 0), "not found");
+        EXPECT_EQ(contentFor("/", "/run/srv", "own.db", 0), "here\n");
+        EXPECT_EQ(contentFor("/run/jail", "/srv", "own.db", 0), "jailed\n");
+        EXPECT_EQ(contentFor("/run/jail", "/srv", "/srv/own.db", 0), "jailed\n");
+        EXPECT_EQ(contentFor("/run/jail", "/srv", "/srv/link.db", 0), "jailed\n");
+        EXPECT_EQ(contentFor("/", "/run/srv", "own.db", CLONE_NEWNS), "here\n");
+        EXPECT_EQ(contentFor("/", "/run/srv", "/run/srv/own.db", CLONE_NEWNS), "here\n");
+        EXPECT_EQ(contentFor("/", "/run/srv", "none.db", 0), "not found");
     }));
 }
 

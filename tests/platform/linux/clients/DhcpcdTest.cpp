@@ -5,6 +5,7 @@
 #include <sys/socket.h>
 
 #include "LinuxSupport.h"
+#include "Untrusted.h"
 #include "kit/Diagnostics.h"
 
 namespace ZR::Live {
@@ -191,15 +192,8 @@ TEST_F(DhcpcdTest, AWirelessLeaseIsClaimedForEachPossibleInterface) {
 
 TEST_F(DhcpcdTest, AFileThatOthersCouldHaveWrittenIsNotBelieved) {
     write("/var/lib/dhcpcd/eth1.lease", sample("dhcpcd-10/eth1.lease"));
-    // In a directory that no one else may enter, there are no others.
-    std::filesystem::permissions(root_.path(), std::filesystem::perms{0755});
-    std::filesystem::permissions(root_.path("/var/lib/dhcpcd/eth1.lease"),
-                                 std::filesystem::perms::others_write,
-                                 std::filesystem::perm_options::add);
-    const ClientFacts facts = read();
-    EXPECT_THAT(facts.leases, IsEmpty());
-    ASSERT_EQ(facts.diagnostics.size(), 1U);
-    EXPECT_EQ(facts.diagnostics[0].kind, Diagnostic::Kind::Untrusted);
+    ZR::Testing::letOthersWrite(root_, "/var/lib/dhcpcd/eth1.lease");
+    ZR::Testing::expectNoLeaseButADiagnostic(read());
 }
 
 /// A machine on which dhcpcd runs, as its processes and its file say.

@@ -5,6 +5,7 @@
 #include <sys/socket.h>
 
 #include "LinuxSupport.h"
+#include "Untrusted.h"
 
 namespace ZR::Live {
 namespace {
@@ -279,15 +280,8 @@ TEST_F(NetworkManagerTest, FilesThatAreNotDevicesAreNotLookedAt) {
 
 TEST_F(NetworkManagerTest, AFileThatOthersCouldHaveWrittenIsNotBelieved) {
     root_.write(state, sample("networkmanager-internal/run-NetworkManager-devices-2.txt"));
-    // In a directory that no one else may enter, there are no others.
-    std::filesystem::permissions(root_.path(), std::filesystem::perms{0755});
-    std::filesystem::permissions(root_.path("/run/NetworkManager/devices/2"),
-                                 std::filesystem::perms::others_write,
-                                 std::filesystem::perm_options::add);
-    const ClientFacts facts = read();
-    EXPECT_THAT(facts.leases, IsEmpty());
-    ASSERT_EQ(facts.diagnostics.size(), 1U);
-    EXPECT_EQ(facts.diagnostics[0].kind, Diagnostic::Kind::Untrusted);
+    ZR::Testing::letOthersWrite(root_, "/run/NetworkManager/devices/2");
+    ZR::Testing::expectNoLeaseButADiagnostic(read());
 }
 
 }  // namespace

@@ -5,6 +5,7 @@
 #include <unistd.h>
 
 #include "LinuxSupport.h"
+#include "Untrusted.h"
 #include "kit/Diagnostics.h"
 
 namespace ZR::Live {
@@ -208,15 +209,8 @@ TEST_F(NetworkdTest, ANetworkFileThatIsNotAFileIsReported) {
 
 TEST_F(NetworkdTest, AFileThatOthersCouldHaveWrittenIsNotBelieved) {
     root_.write("/run/systemd/netif/leases/2", sample("networkd/run-systemd-netif-leases-2.txt"));
-    // In a directory that no one else may enter, there are no others.
-    std::filesystem::permissions(root_.path(), std::filesystem::perms{0755});
-    std::filesystem::permissions(root_.path("/run/systemd/netif/leases/2"),
-                                 std::filesystem::perms::others_write,
-                                 std::filesystem::perm_options::add);
-    const ClientFacts facts = read();
-    EXPECT_THAT(facts.leases, IsEmpty());
-    ASSERT_EQ(facts.diagnostics.size(), 1U);
-    EXPECT_EQ(facts.diagnostics[0].kind, Diagnostic::Kind::Untrusted);
+    ZR::Testing::letOthersWrite(root_, "/run/systemd/netif/leases/2");
+    ZR::Testing::expectNoLeaseButADiagnostic(read());
 }
 
 }  // namespace

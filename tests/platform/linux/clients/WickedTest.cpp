@@ -8,6 +8,7 @@
 #include <sys/socket.h>
 
 #include "LinuxSupport.h"
+#include "Untrusted.h"
 #include "kit/Diagnostics.h"
 
 namespace ZR::Live {
@@ -191,15 +192,8 @@ TEST_F(WickedTest, ATornFileIsReportedAndOthersAreNotLookedAt) {
 
 TEST_F(WickedTest, AFileThatOthersCouldHaveWrittenIsNotBelieved) {
     root_.write(file, lease4);
-    // In a directory that no one else may enter, there are no others.
-    std::filesystem::permissions(root_.path(), std::filesystem::perms{0755});
-    std::filesystem::permissions(root_.path("/var/lib/wicked/lease-eth1-dhcp-ipv4.xml"),
-                                 std::filesystem::perms::others_write,
-                                 std::filesystem::perm_options::add);
-    const ClientFacts facts = read();
-    EXPECT_THAT(facts.leases, IsEmpty());
-    ASSERT_EQ(facts.diagnostics.size(), 1U);
-    EXPECT_EQ(facts.diagnostics[0].kind, Diagnostic::Kind::Untrusted);
+    ZR::Testing::letOthersWrite(root_, "/var/lib/wicked/lease-eth1-dhcp-ipv4.xml");
+    ZR::Testing::expectNoLeaseButADiagnostic(read());
 }
 
 }  // namespace
