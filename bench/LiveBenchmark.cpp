@@ -54,17 +54,7 @@ using bench::fail;
 
 void enterMachineWithALease() {
     bench::enterOwnMachine();
-    // One client has left a lease.
-    FILE* file = nullptr;
-    if (::mkdir("/var/lib/dhcp", 0755) != 0 ||
-        (file = std::fopen("/var/lib/dhcp/dhclient.leases", "w")) == nullptr ||
-        std::fputs("lease {\n  interface \"b1\";\n  fixed-address 10.0.0.2;\n"
-                   "  option dhcp-server-identifier 10.0.0.1;\n"
-                   "  expire 5 2199/11/20 23:19:41;\n}\n",
-                   file) < 0 ||
-        std::fclose(file) != 0) {
-        fail("/var/lib/dhcp/dhclient.leases");
-    }
+    bench::leaveLeases(bench::leaseOf("b1", "10.0.0.2", "10.0.0.1"));
 }
 
 /// Makes links until there are so many.

@@ -29,12 +29,16 @@ constexpr std::size_t interfaces = 4;
 void enterMachineOfFour() {
     bench::enterOwnMachine();
     std::string lines;
+    std::string leases;
     for (std::size_t i = 0; i < interfaces; ++i) {
-        // A finite lifetime is the kernel's own sign of an address by DHCP.
+        // The address and its lease have no end.
         const std::string link = "b" + std::to_string(i);
-        lines += "link add " + link + " type bridge\nlink set " + link + " up\naddr add 192.0.2." +
-                 std::to_string(i + 1) + "/32 dev " + link + " valid_lft 600 preferred_lft 600\n";
+        const std::string address = "192.0.2." + std::to_string(i + 1);
+        lines += "link add " + link + " type bridge\nlink set " + link + " up\naddr add " +
+                 address + "/32 dev " + link + "\n";
+        leases += bench::leaseOf(link, address, "192.0.2.254");
     }
+    bench::leaveLeases(leases);
     bench::configureLinks(lines);
     ::setenv("ZR_LOG_SINK", "none", 1);
     ::setenv("ZR_TRACE_SINK", "none", 1);
