@@ -56,44 +56,54 @@ target_precompile_headers(room_headers PRIVATE
     <memory> <mutex> <optional> <span> <sstream> <string> <string_view> <system_error>
     <unordered_map> <unordered_set> <utility> <variant> <vector>)
 
+# zr_small(file...): in optimised builds, these are to be small rather than quick.
+function(zr_small)
+    if(CMAKE_BUILD_TYPE STREQUAL "Release")
+        set_source_files_properties(${ARGN} PROPERTIES COMPILE_OPTIONS -Os)
+    endif()
+endfunction()
+
 # zr_precompiled(TARGET) lets a library of the product use these. Headers fit only
 # options like their own: a source that is optimised in another way goes without.
 function(zr_precompiled target)
     get_target_property(sources ${target} SOURCES)
     foreach(source IN LISTS sources)
         get_source_file_property(options ${source} COMPILE_OPTIONS)
-        if(options AND CMAKE_BUILD_TYPE STREQUAL "Release")
+        if(options)
             set_source_files_properties(${source} PROPERTIES SKIP_PRECOMPILE_HEADERS ON)
         endif()
     endforeach()
     target_precompile_headers(${target} REUSE_FROM room_headers)
 endfunction()
 
-# zr_compiled_together(TARGET [EXCEPT file...]): the quick build of scripts/run compiles
-# the sources of each folder of the target as one, but for those whose own names another
-# one of the folder has, too: what they instantiate of templates is then made once.
+# zr_compiled_together(TARGET [EXCEPT file|folder/...]): with ZR_COMPILED_TOGETHER, as for
+# scripts/run and the sanitizers, the sources of each folder of the target are compiled as
+# one, but for those whose own names another one of the folder has, too: headers are then
+# read, and what is instantiated of templates is made, once.
 function(zr_compiled_together target)
-    if(NOT CMAKE_BUILD_TYPE STREQUAL "Quick")
+    if(NOT ZR_COMPILED_TOGETHER)
         return()
     endif()
     cmake_parse_arguments(TOGETHER "" "" "EXCEPT" ${ARGN})
     set_target_properties(${target} PROPERTIES UNITY_BUILD ON UNITY_BUILD_MODE GROUP)
     get_target_property(sources ${target} SOURCES)
     foreach(source IN LISTS sources)
+        cmake_path(ABSOLUTE_PATH source BASE_DIRECTORY ${CMAKE_CURRENT_SOURCE_DIR})
         cmake_path(RELATIVE_PATH source BASE_DIRECTORY ${CMAKE_CURRENT_SOURCE_DIR})
         cmake_path(GET source PARENT_PATH folder)
         string(MAKE_C_IDENTIFIER "${target}/${folder}" group)
-        if(NOT source IN_LIST TOGETHER_EXCEPT)
+        if(NOT source IN_LIST TOGETHER_EXCEPT AND NOT "${folder}/" IN_LIST TOGETHER_EXCEPT)
             set_source_files_properties(${source} PROPERTIES UNITY_GROUP ${group})
         endif()
     endforeach()
 endfunction()
 
-# zr_room(NAME SOURCES file... [ROOT directory] [LINKS target...] [PRIVATE_LINKS target...])
+# zr_room(NAME SOURCES file... [ROOT directory] [LINKS target...] [PRIVATE_LINKS target...]
+#         [ALONE file|folder/...])
 # A static library whose public headers are under include/, and whose own are named from
-# ROOT, which is src unless given.
+# ROOT, which is src unless given. ALONE: what is never compiled together.
 function(zr_room name)
-    cmake_parse_arguments(ROOM "" "ROOT" "SOURCES;LINKS;PRIVATE_LINKS" ${ARGN})
+    cmake_parse_arguments(ROOM "" "ROOT" "SOURCES;LINKS;PRIVATE_LINKS;ALONE" ${ARGN})
     if(NOT ROOM_ROOT)
         set(ROOM_ROOT src)
     endif()
@@ -105,6 +115,7 @@ function(zr_room name)
     target_link_libraries(${name} PUBLIC ${ROOM_LINKS}
                           PRIVATE $<BUILD_INTERFACE:zr_options> ${ROOM_PRIVATE_LINKS})
     zr_precompiled(${name})
+    zr_compiled_together(${name} EXCEPT ${ROOM_ALONE})
 endfunction()
 
 # zr_provider_library(NAME OBJECTS target COMPONENT component EXPORTS symbol...)
@@ -132,10 +143,7 @@ endfunction()
 # g++ 12 sees null pointers in the standard library's streams where there are none.
 add_library(test_options INTERFACE)
 target_compile_options(test_options INTERFACE
-    $<$<CONFIG:Release>:-O1> $<$<CXX_COMPILER_ID:GNU>:-Wno-null-dereference>)
-if(ZR_SANITIZERS)
-    target_compile_options(test_options INTERFACE -O0)
-endif()
+    -O0 $<$<CXX_COMPILER_ID:GNU>:-Wno-null-dereference>)
 
 # The headers that every test includes, compiled once: most of a test's compile
 # time would go into them. With the printers, so that no comparison shows mere bytes.
@@ -150,12 +158,13 @@ function(zr_test_headers)
 endfunction()
 
 # zr_test(NAME SOURCES file... [LINKS target...] [LABELS label...] [ENVIRONMENT NAME=value...]
-#         [COST seconds] [SERIAL])
+#         [COST seconds] [SERIAL] [ONE_THREAD])
 # One test program; each of its tests is a test of its own to ctest. COST: what its longest
 # takes, so that a machine with several processors begins with it. SERIAL: no other test
-# runs meanwhile.
+# runs meanwhile. ONE_THREAD: nothing in it is used by two threads at once, so that the
+# thread sanitizer has nothing to find.
 function(zr_test name)
-    cmake_parse_arguments(TEST "SERIAL" "COST" "SOURCES;LINKS;LABELS;ENVIRONMENT" ${ARGN})
+    cmake_parse_arguments(TEST "SERIAL;ONE_THREAD" "COST" "SOURCES;LINKS;LABELS;ENVIRONMENT" ${ARGN})
     if(NOT TARGET test_headers)
         zr_test_headers()
     endif()
@@ -168,6 +177,10 @@ function(zr_test name)
                           GTest::gtest_main)
     target_compile_definitions(${name} PRIVATE ZR_SOURCE_DIR="${PROJECT_SOURCE_DIR}"
                                ZR_BINARY_DIR="${PROJECT_BINARY_DIR}")
+    if(TEST_ONE_THREAD AND ZR_SANITIZERS MATCHES thread)
+        set_target_properties(${name} PROPERTIES EXCLUDE_FROM_ALL ON)
+        return()
+    endif()
     # Twice the weight of those that mostly wait, of which so many more run at once.
     set(properties TIMEOUT 120 PROCESSORS 2)
     if(TEST_SERIAL)

@@ -17,7 +17,7 @@ namespace {
 namespace fs = std::filesystem;
 using Verdict = Finding::Verdict;
 
-constexpr const char* what = "data directory";
+constexpr const char* dataDirectory = "data directory";
 
 /// The one of the directories that a directory is, or lies in; empty: none. Compared as
 /// the file system does, so that links and mounts hide nothing.
@@ -75,7 +75,7 @@ Finding contentOf(const std::string& directory) {
         }
     }
     if (error) {
-        return {Verdict::bad, what, printable(directory) + ": " + error.message(),
+        return {Verdict::bad, dataDirectory, printable(directory) + ": " + error.message(),
                 "let this user read it, or run as another one"};
     }
     std::string refused = reading.text("read") + writing.text("change");
@@ -84,7 +84,7 @@ Finding contentOf(const std::string& directory) {
         refused +=
             std::string("; this user may not make files there (") + std::strerror(reason) + ")";
     }
-    return {refused.empty() ? Verdict::good : Verdict::notable, what,
+    return {refused.empty() ? Verdict::good : Verdict::notable, dataDirectory,
             printable(directory) + " has " + counted(files, "ifcfg file", "ifcfg files") + refused,
             refused.empty() ? "" : "rename as a user who may, such as root"};
 }
@@ -104,7 +104,7 @@ void lookAtDataDirectory(const std::string& directory, std::vector<Finding>& fin
     if (fs::is_directory(directory, error)) {
         findings.push_back(contentOf(directory));
     } else {
-        findings.push_back({Verdict::notable, what,
+        findings.push_back({Verdict::notable, dataDirectory,
                             printable(directory) +
                                 " does not exist: no configuration has a name, and none can be "
                                 "given",
@@ -112,7 +112,7 @@ void lookAtDataDirectory(const std::string& directory, std::vector<Finding>& fin
     }
     if (const fs::path place = sourcedAbove(directory, sourced); !place.empty()) {
         findings.push_back(
-            {Verdict::notable, what,
+            {Verdict::notable, dataDirectory,
              printable(directory) + " is in " + place.string() +
                  ", whose files shells or network scripts read: who reads an ifcfg file there, "
                  "often as root, runs the commands that a configuration name holds, and whoever "

@@ -12,7 +12,9 @@
 #include <thread>
 #include <vector>
 
+#include "NamespaceMachine.h"
 #include "kit/FileContent.h"
+#include "kit/Namespaces.h"
 #include "kit/ProviderHost.h"
 #include "kit/Script.h"
 #include "kit/TreeMachine.h"
@@ -20,7 +22,6 @@
 namespace test {
 namespace {
 
-constexpr unsigned threads = 64;
 constexpr unsigned rounds = 30;
 constexpr unsigned states = 4;
 
@@ -36,15 +37,54 @@ std::string copyOfTheLibraries(const ZR::Testing::TemporaryDirectory& directory)
     return directory.path().string();
 }
 
-class Concurrency : public ::testing::Test {
-  protected:
-    Concurrency() {
+/// Those who ask at once, on a machine that changes.
+class Crowd {
+  public:
+    explicit Crowd(Machine& machine) : machine_(machine) {
         std::filesystem::create_directory(data_);
         ::setenv("ZR_DATA_DIR", data_.c_str(), 1);
         ::setenv("ZR_LOG_SINK", "none", 1);
         machine_.enter(0);
     }
 
+    /// Expects each response, of so many threads, to be one that a state of the machine has.
+    void ask(unsigned threads) {
+        ProviderHost host;
+        askSerially(host);
+        std::atomic<bool> finished = false;
+        // Interfaces come and go.
+        std::thread changing([&] {
+            for (unsigned state = 0; !finished; ++state) {
+                machine_.enter(state % states);
+                std::this_thread::yield();
+            }
+        });
+        // A second object manager loads the library, asks it, and unloads it.
+        std::atomic<unsigned> loads = 0;
+        std::thread loading([&] {
+            const ZR::Testing::TemporaryDirectory copies;
+            const std::string directory = copyOfTheLibraries(copies);
+            while (!finished) {
+                ProviderHost other(directory);
+                askAndCompare(other, ++loads);
+            }
+        });
+        std::vector<std::thread> asking;
+        asking.reserve(threads);
+        for (unsigned i = 0; i < threads; ++i) {
+            asking.emplace_back([&, i] { askAndCompare(host, i); });
+        }
+        for (std::thread& thread : asking) {
+            thread.join();
+        }
+        finished = true;
+        changing.join();
+        loading.join();
+        EXPECT_GT(loads, 0U);
+        EXPECT_EQ(ZR::Testing::readFile(configurationFile_), newContent);
+    }
+
+  private:
     /// The response to a request without others beside it, in each state that there will be.
     void askSerially(ProviderHost& host) {
         for (unsigned state = 0; state < states; ++state) {
@@ -72,7 +112,7 @@ class Concurrency : public ::testing::Test {
         }
     }
 
-    TreeMachine machine_;
+    Machine& machine_;
     ZR::Testing::TemporaryDirectory directory_;
     std::string data_ = directory_ / "data/";
     std::string configurationFile_ = data_ + "ifcfg-eth0";
@@ -80,41 +120,17 @@ class Concurrency : public ::testing::Test {
     std::mutex mutex_;
 };
 
-TEST_F(Concurrency, EveryAnswerIsThatOfAStateThatExisted) {
-    ProviderHost host;
-    askSerially(host);
-    std::atomic<bool> finished = false;
-    // Interfaces come and go.
-    std::thread changing([&] {
-        for (unsigned state = 0; !finished; ++state) {
-            machine_.enter(state % states);
-            std::this_thread::yield();
-        }
-    });
-    // A second object manager loads the library, asks it, and unloads it.
-    std::atomic<unsigned> loads = 0;
-    std::thread loading([&] {
-        const ZR::Testing::TemporaryDirectory copies;
-        const std::string directory = copyOfTheLibraries(copies);
-        while (!finished) {
-            ProviderHost other(directory);
-            askAndCompare(other, ++loads);
-        }
-    });
-    std::vector<std::thread> asking;
-    asking.reserve(threads);
-    for (unsigned i = 0; i < threads; ++i) {
-        asking.emplace_back([&, i] { askAndCompare(host, i); });
-    }
-    for (std::thread& thread : asking) {
-        thread.join();
-    }
-    finished = true;
-    changing.join();
-    loading.join();
-    EXPECT_GT(loads, 0U);
-    const std::string content = ZR::Testing::readFile(configurationFile_);
-    EXPECT_EQ(content, newContent);
+TEST(Concurrency, EveryResponseIsThatOfAStateThatExisted) {
+    TreeMachine machine;
+    Crowd(machine).ask(64);
+}
+
+TEST(Concurrency, EveryResponseOfALiveMachineIsThatOfAStateThatExisted) {
+    ZR_NEEDS_NAMESPACES();
+    EXPECT_TRUE(ZR::Live::passesInNamespaces(100, [] {
+        LiveMachine machine;
+        Crowd(machine).ask(8);
+    }));
 }
 
 }  // namespace

@@ -25,8 +25,9 @@ AddressSource sourceOf(const LanChannel& lan) {
 }  // namespace
 
 void addServiceProcessor(const ServiceProcessor& processor, SnapshotBuilder& tree) {
-    const auto computer = tree.add(Snapshot::none, "ComputerSystem", "BMC");
-    tree.property(Properties::Name, "BMC:-1");
+    const auto computer =
+        tree.add(Snapshot::none, "ComputerSystem", NodeLexicon::serviceProcessorDescription);
+    tree.property(Properties::Name, NodeLexicon::serviceProcessorName);
     if (!processor.lan) {
         return;
     }
