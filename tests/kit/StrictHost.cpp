@@ -3,6 +3,7 @@
 #include <dlfcn.h>
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <exception>
 #include <utility>
 
@@ -49,7 +50,8 @@ CMPIStatus callSlot(const char* name, Slot slot, Arguments... arguments) {
 void append(StrictHost::Response& all, StrictHost::Response one) {
     // The first error is the result, and what was handed over before it is discarded.
     if (all.code != CMPI_RC_OK || one.code != CMPI_RC_OK) {
-        all = {all.code == CMPI_RC_OK ? one.code : all.code, {}, {}};
+        const StrictHost::Response& failed = all.code == CMPI_RC_OK ? one : all;
+        all = {failed.code, failed.message, {}, {}};
         return;
     }
     all.paths.insert(all.paths.end(), one.paths.begin(), one.paths.end());
@@ -60,13 +62,12 @@ void append(StrictHost::Response& all, StrictHost::Response one) {
 
 StrictHost::StrictHost(const std::string& schemaDirectory,
                        const std::vector<std::string>& registrations, std::string libraryDirectory,
-                       Binding binding, Contexts contexts)
+                       const Traits& traits)
     : repository_(loadSchema(schemaDirectory)),
       registrations_(readAll(registrations)),
       directory_(std::move(libraryDirectory)),
-      flags_(RTLD_GLOBAL | (binding == Binding::now ? RTLD_NOW : RTLD_LAZY)),
-      contexts_(contexts),
-      broker_(strictBroker(*this)) {
+      traits_(traits),
+      broker_(strictBroker(*this, traits)) {
     load();
 }
 
@@ -80,7 +81,7 @@ StrictHost& StrictHost::of(const CMPIBroker* broker) {
 
 const CMPIContext* StrictHost::context(const std::string& nameSpace) const {
     std::vector<cimom::NamedValue> entries;
-    if (contexts_ == Contexts::filled) {
+    if (!traits_.emptyContexts) {
         cimom::Value flags;
         flags.type = cimom::Type::uint32;
         flags.content = cimom::Scalar(std::uint64_t{0});
@@ -92,13 +93,13 @@ const CMPIContext* StrictHost::context(const std::string& nameSpace) const {
 }
 
 template <typename Record>
-void StrictHost::create(Library& library, const std::string& provider, const char* kind,
+void StrictHost::create(Provider& provider, const std::string& providerName, const char* kind,
                         Record*& record) {
     using Factory = Record* (*)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
-    const std::string name = provider + "_Create_" + kind + "MI";
-    const auto factory = reinterpret_cast<Factory>(::dlsym(library.handle, name.c_str()));
+    const std::string name = providerName + "_Create_" + kind + "MI";
+    const auto factory = reinterpret_cast<Factory>(::dlsym(provider.handle, name.c_str()));
     ASSERT_NE(factory, nullptr) << name;
-    const RequestObjects objects;
+    const RequestObjects objects(traits_);
     CMPIStatus status{CMPI_RC_OK, nullptr};
     Record* made = factory(&broker_, context("root/cimv2"), &status);
     ASSERT_NE(made, nullptr) << name;
@@ -110,25 +111,26 @@ void StrictHost::create(Library& library, const std::string& provider, const cha
 
 void StrictHost::load() {
     for (const cimom::Registration& registration : registrations_) {
-        Library& library = libraries_[registration.location];
-        if (library.handle == nullptr) {
+        Provider& provider = providers_[registration.provider];
+        if (provider.handle == nullptr) {
+            provider.location = registration.location;
             const std::string file = directory_ + "/lib" + registration.location + ".so";
-            library.handle = ::dlopen(file.c_str(), flags_);
-            ASSERT_NE(library.handle, nullptr) << ::dlerror();
+            provider.handle =
+                ::dlopen(file.c_str(), RTLD_GLOBAL | (traits_.lateBinding ? RTLD_LAZY : RTLD_NOW));
+            ASSERT_NE(provider.handle, nullptr) << ::dlerror();
         }
         if (registration.instance) {
-            create(library, registration.provider, "Instance", library.instance);
+            create(provider, registration.provider, "Instance", provider.instance);
         }
         if (registration.association) {
-            create(library, registration.provider, "Association", library.association);
+            create(provider, registration.provider, "Association", provider.association);
         }
     }
 }
 
 bool StrictHost::unload(bool terminating) {
-    bool gone = true;
-    for (auto& [location, library] : libraries_) {
-        const RequestObjects objects;
+    for (auto& [name, provider] : providers_) {
+        const RequestObjects objects(traits_);
         const auto cleanUp = [&](auto* record) {
             if (record != nullptr) {
                 const CMPIStatus status =
@@ -137,42 +139,53 @@ bool StrictHost::unload(bool terminating) {
                 EXPECT_EQ(status.rc, CMPI_RC_OK);
             }
         };
-        cleanUp(library.instance);
-        cleanUp(library.association);
-        EXPECT_EQ(::dlclose(library.handle), 0);
-        const std::string file = directory_ + "/lib" + location + ".so";
+        cleanUp(provider.instance);
+        cleanUp(provider.association);
+    }
+    for (auto& [name, provider] : providers_) {
+        EXPECT_EQ(::dlclose(provider.handle), 0);
+    }
+    bool gone = true;
+    for (auto& [name, provider] : providers_) {
+        const std::string file = directory_ + "/lib" + provider.location + ".so";
         if (void* still = ::dlopen(file.c_str(), RTLD_NOW | RTLD_NOLOAD)) {
             ::dlclose(still);
             gone = false;
         }
     }
-    libraries_.clear();
+    providers_.clear();
     return gone;
 }
 
 void* StrictHost::symbol(const std::string& location, const std::string& name) const {
-    return ::dlsym(libraries_.at(location).handle, name.c_str());
+    const auto found = std::find_if(providers_.begin(), providers_.end(), [&](const auto& entry) {
+        return entry.second.location == location;
+    });
+    return found == providers_.end() ? nullptr : ::dlsym(found->second.handle, name.c_str());
 }
 
 StrictHost::Response StrictHost::request(Kind kind, const cimom::ObjectPath& path,
                                          const Call& call) {
-    const RequestObjects objects;
+    const RequestObjects objects(traits_);
     auto* result = RequestObjects::make<ResultObject>(repository_, kind);
     const CMPIStatus status =
         call(context(path.nameSpace), result, RequestObjects::make<PathObject>(repository_, path));
+    std::string message;
     if (status.msg != nullptr) {
-        RequestObjects::get<StringObject>(status.msg, "The status");
+        if (const auto* text = RequestObjects::get<StringObject>(status.msg, "The status")) {
+            message = text->text;
+        }
     }
     if (status.rc != CMPI_RC_OK) {
-        return {status.rc, {}, {}};
+        return {status.rc, std::move(message), {}, {}};
     }
-    return {CMPI_RC_OK, std::move(result->paths), std::move(result->instances)};
+    return {CMPI_RC_OK, std::move(message), std::move(result->paths), std::move(result->instances)};
 }
 
-const StrictHost::Library* StrictHost::serving(const std::string& className) const {
+const StrictHost::Provider* StrictHost::serving(const std::string& className) const {
     for (const cimom::Registration& registration : registrations_) {
         if (cimom::sameName(registration.className, className)) {
-            return &libraries_.at(registration.location);
+            return &providers_.at(registration.provider);
         }
     }
     return nullptr;
@@ -180,7 +193,7 @@ const StrictHost::Library* StrictHost::serving(const std::string& className) con
 
 StrictHost::Response StrictHost::eachClass(
     Kind kind, const cimom::ObjectPath& path,
-    const std::function<CMPIStatus(const Library&, const CMPIContext*, const CMPIResult*,
+    const std::function<CMPIStatus(const Provider&, const CMPIContext*, const CMPIResult*,
                                    const CMPIObjectPath*)>& call) {
     Response all;
     for (const cimom::Registration& registration : registrations_) {
@@ -189,26 +202,26 @@ StrictHost::Response StrictHost::eachClass(
         }
         cimom::ObjectPath ofSubclass = path;
         ofSubclass.className = registration.className;
-        const Library& library = libraries_.at(registration.location);
+        const Provider& provider = providers_.at(registration.provider);
         append(all, request(kind, ofSubclass, [&](auto* context, auto* result, auto* record) {
-                   return call(library, context, result, record);
+                   return call(provider, context, result, record);
                }));
     }
     return all;
 }
 
 StrictHost::Response StrictHost::enumerateNames(const cimom::ObjectPath& path) {
-    return eachClass(Kind::paths, path, [](auto& library, auto* context, auto* result, auto* op) {
-        return callSlot("enumerateInstanceNames", library.instance->ft->enumerateInstanceNames,
-                        library.instance, context, result, op);
+    return eachClass(Kind::paths, path, [](auto& provider, auto* context, auto* result, auto* op) {
+        return callSlot("enumerateInstanceNames", provider.instance->ft->enumerateInstanceNames,
+                        provider.instance, context, result, op);
     });
 }
 
 StrictHost::Response StrictHost::enumerate(const cimom::ObjectPath& path, const char** properties) {
     return eachClass(
-        Kind::instances, path, [=](auto& library, auto* context, auto* result, auto* op) {
-            return callSlot("enumerateInstances", library.instance->ft->enumerateInstances,
-                            library.instance, context, result, op, properties);
+        Kind::instances, path, [=](auto& provider, auto* context, auto* result, auto* op) {
+            return callSlot("enumerateInstances", provider.instance->ft->enumerateInstances,
+                            provider.instance, context, result, op, properties);
         });
 }
 
@@ -216,19 +229,25 @@ StrictHost::Response StrictHost::ofClass(
     Kind kind, const cimom::ObjectPath& path,
     const std::function<CMPIStatus(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
                                    const CMPIObjectPath*)>& call) {
-    const Library* library = serving(path.className);
-    if (library == nullptr) {
-        return {CMPI_RC_ERR_NOT_SUPPORTED, {}, {}};
+    const Provider* provider = serving(path.className);
+    if (provider == nullptr) {
+        return {CMPI_RC_ERR_NOT_SUPPORTED, "", {}, {}};
     }
     return request(kind, path, [&](auto* context, auto* result, auto* op) {
-        return call(library->instance, context, result, op);
+        return call(provider->instance, context, result, op);
     });
 }
 
 StrictHost::Response StrictHost::get(const cimom::ObjectPath& path, const char** properties) {
-    return ofClass(Kind::instances, path, [=](auto* mi, auto* context, auto* result, auto* op) {
-        return callSlot("getInstance", mi->ft->getInstance, mi, context, result, op, properties);
-    });
+    Response response =
+        ofClass(Kind::instances, path, [=](auto* mi, auto* context, auto* result, auto* op) {
+            return callSlot("getInstance", mi->ft->getInstance, mi, context, result, op,
+                            properties);
+        });
+    if (traits_.firstInstance && response.instances.size() > 1) {
+        response.instances.erase(response.instances.begin() + 1, response.instances.end());
+    }
+    return response;
 }
 
 StrictHost::Response StrictHost::create(const cimom::Instance& instance) {
@@ -269,7 +288,7 @@ StrictHost::Response StrictHost::eachAssociator(
     const std::function<CMPIStatus(CMPIAssociationMI*, const CMPIContext*, const CMPIResult*,
                                    const CMPIObjectPath*)>& call) {
     Response all;
-    for (const auto& entry : libraries_) {
+    for (const auto& entry : providers_) {
         CMPIAssociationMI* mi = entry.second.association;
         if (mi != nullptr) {
             append(all, request(kind, path, [&](auto* context, auto* result, auto* op) {

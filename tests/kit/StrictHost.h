@@ -10,6 +10,7 @@
 #include "cimom/ClassRepository.h"
 #include "cimom/ObjectManager.h"
 #include "kit/StrictObjects.h"
+#include "kit/StrictTraits.h"
 
 namespace strict {
 
@@ -24,20 +25,15 @@ namespace strict {
 /// Requests may come from many threads; loading and unloading may not.
 class StrictHost {
   public:
-    /// Whether symbols are bound when a library is opened, or when they are used.
-    enum class Binding { now, lazy };
-    /// Whether contexts have their usual entries, or none.
-    enum class Contexts { filled, empty };
-
     struct Response {
         CMPIrc code = CMPI_RC_OK;
+        std::string message;  ///< of the status; empty when it has none
         std::vector<cimom::ObjectPath> paths;
         std::vector<cimom::Instance> instances;
     };
 
     StrictHost(const std::string& schemaDirectory, const std::vector<std::string>& registrations,
-               std::string libraryDirectory, Binding binding = Binding::now,
-               Contexts contexts = Contexts::filled);
+               std::string libraryDirectory, const Traits& traits = {});
     ~StrictHost();
     StrictHost(const StrictHost&) = delete;
     StrictHost& operator=(const StrictHost&) = delete;
@@ -88,20 +84,22 @@ class StrictHost {
     [[nodiscard]] const CMPIBroker* broker() const { return &broker_; }
 
   private:
-    struct Library {
+    /// A provider, in a library that may hold others, too.
+    struct Provider {
+        std::string location;
         void* handle = nullptr;
         CMPIInstanceMI* instance = nullptr;
         CMPIAssociationMI* association = nullptr;
     };
 
     template <typename Record>
-    void create(Library& library, const std::string& provider, const char* kind, Record*& record);
-    /// The library of a class that is registered itself.
-    const Library* serving(const std::string& className) const;
+    void create(Provider& provider, const std::string& name, const char* kind, Record*& record);
+    /// The provider of a class that is registered itself.
+    const Provider* serving(const std::string& className) const;
     /// Calls the provider of each registered class at or below the path's, with that class.
     Response eachClass(
         ResultObject::Kind kind, const cimom::ObjectPath& path,
-        const std::function<CMPIStatus(const Library&, const CMPIContext*, const CMPIResult*,
+        const std::function<CMPIStatus(const Provider&, const CMPIContext*, const CMPIResult*,
                                        const CMPIObjectPath*)>& call);
     /// Calls each provider of associations once.
     Response eachAssociator(
@@ -118,10 +116,9 @@ class StrictHost {
     cimom::ClassRepository repository_;
     std::vector<cimom::Registration> registrations_;
     std::string directory_;
-    int flags_;
-    Contexts contexts_;
+    Traits traits_;
     CMPIBroker broker_;
-    std::map<std::string, Library> libraries_;  ///< by location
+    std::map<std::string, Provider> providers_;  ///< by name
 };
 
 }  // namespace strict
