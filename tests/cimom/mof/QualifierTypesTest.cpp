@@ -90,7 +90,7 @@ TEST_F(QualifierTypesTest, RefusesWhatIsUnknownMisplacedDoubledOrOfAnotherType) 
 
 TEST_F(QualifierTypesTest, RefusesATypeThatIsDeclaredTwice) {
     EXPECT_EQ(errorOf([&] { declare("kEY", Type::string, {}, {}); }),
-              "q.mof:1:11: qualifier kEY is declared twice");
+              "q.mof:1:11: qualifier kEY is declared twice, in different ways");
 }
 
 TEST_F(QualifierTypesTest, OnlyQualifiersToSubclassAreInherited) {
