@@ -32,8 +32,8 @@ std::vector<std::pair<Provider*, std::vector<const ServedClass*>>> byProvider(
     const std::vector<const ServedClass*>& classes) {
     std::vector<std::pair<Provider*, std::vector<const ServedClass*>>> found;
     for (const ServedClass* const one : classes) {
-        auto entry = std::ranges::find(found, one->provider,
-                                       [](const auto& each) { return each.first; });
+        auto entry =
+            std::ranges::find(found, one->provider, [](const auto& each) { return each.first; });
         if (entry == found.end()) {
             entry = found.insert(found.end(), {one->provider, {}});
         }
@@ -48,8 +48,7 @@ ObjectManager::Implementation::Associations ObjectManager::Implementation::assoc
     const ObjectPath& source, const std::optional<std::string>& className,
     const AssociationRequest& request) const {
     Associations found;
-    found.classes =
-        className ? servedAssociations(*className, source.nameSpace) : associations_;
+    found.classes = className ? servedAssociations(*className, source.nameSpace) : associations_;
     found.exact = className && found.classes.size() == 1 &&
                   sameName(found.classes.front()->declaration->name, *className);
     // A provider is asked about any source if the client named its class, since what it
@@ -77,7 +76,7 @@ bool ObjectManager::Implementation::canBeAssociator(const ServedClasses& associa
 CallOutcome ObjectManager::Implementation::noted(const Provider& provider, const ObjectPath& path,
                                                  CallOutcome outcome) const {
     const Status& status = outcome.status;
-    if (!status.ok() && !hasNothing(status) && configuration_.log) {
+    if (!status.ok() && (status.noProvider || !hasNothing(status)) && configuration_.log) {
         configuration_.log("provider " + provider.name() +
                            " failed in a request about associations of a " + path.className + ": " +
                            std::string(statusName(status.code)) +
@@ -216,10 +215,10 @@ RequestEnd ObjectManager::Implementation::associated(ObjectPath path,
             // provider has returned: it may hold a lock while it hands objects over. When
             // it cannot tell them, all of the result counts.
             std::optional<std::vector<Instance>> known;
-            call.status = noted(*provider, path,
-                                callForAssociations(*provider, classes, path, request.principal,
-                                                    known))
-                              .status;
+            call.status =
+                noted(*provider, path,
+                      callForAssociations(*provider, classes, path, request.principal, known))
+                    .status;
             if (!call.status.ok()) {
                 continue;
             }
@@ -254,9 +253,9 @@ RequestEnd ObjectManager::Implementation::referring(ObjectPath path,
         const Associations associations = associationsOf(path, request.resultClass, request);
         std::vector<CallOutcome> calls;
         for (const ServedClass* const one : associations.classes) {
-            calls.push_back(noted(*one->provider, path,
-                                  callReferences(*one->provider, path, one->declaration->name,
-                                                 request, &requested)));
+            calls.push_back(noted(
+                *one->provider, path,
+                callReferences(*one->provider, path, one->declaration->name, request, &requested)));
         }
         return endOfAssociations(calls, associations.exact);
     });

@@ -78,8 +78,8 @@ class RegistrationReader {
         std::string nameSpace;
         std::string provider;
         std::string location;
-        if (!(words >> className >> nameSpace >> provider >> location) ||
-            !(words >> std::ws) || words.eof() || !isName(className)) {
+        if (!(words >> className >> nameSpace >> provider >> location) || !(words >> std::ws) ||
+            words.eof() || !isName(className)) {
             fail(line_, "\"" + std::string(text) +
                             "\" is neither [CLASS] nor a line of the form "
                             "CLASS NAMESPACE PROVIDER LOCATION TYPE...");

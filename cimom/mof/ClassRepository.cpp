@@ -48,7 +48,7 @@ class ClassRepository::Implementation {
     struct Node {
         ClassDeclaration declaration;
         const Node* superclass = nullptr;
-        bool stands = false;  ///< against further declarations
+        bool stands = false;                       ///< against further declarations
         std::vector<const Node*> subclasses = {};  ///< in the order of loading
     };
 

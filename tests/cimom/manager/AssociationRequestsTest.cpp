@@ -80,11 +80,10 @@ TEST_F(AssociationRequests, AssociationClassIsTheProvidersMatter) {
 
 TEST_F(AssociationRequests, UnknownClassIsAnInvalidParameterOfEachOperation) {
     takeLog();
-    const Status refused{
-        CMPI_RC_ERR_INVALID_PARAMETER,
-        "no class \"Nobody_Knows\", by which the associations are to be chosen"};
-    for (const AssociationRequest& unknown : {request("Nobody_Knows", none, none, none),
-                                              request(none, "Nobody_Knows", none, none)}) {
+    const Status refused{CMPI_RC_ERR_INVALID_PARAMETER,
+                         "no class \"Nobody_Knows\", by which the associations are to be chosen"};
+    for (const AssociationRequest& unknown :
+         {request("Nobody_Knows", none, none, none), request(none, "Nobody_Knows", none, none)}) {
         EXPECT_EQ(manager.associators(l1, unknown).status, refused);
         EXPECT_EQ(manager.associatorNames(l1, unknown).status, refused);
     }
