@@ -26,8 +26,8 @@ constexpr int interfaces = 100;
 cimom::Configuration configuration() {
     cimom::Configuration all;
     all.schemaDirectories = {ZR_SOURCE_DIR "/schema"};
-    all.registrationFiles = {ZR_SOURCE_DIR "/schema/DHCPClientProvider.registration",
-                             ZR_SOURCE_DIR "/schema/DHCPClientNeighbours.registration"};
+    all.registrationFiles = {ZR_SOURCE_DIR "/schema/exact/DHCPClientProvider.registration",
+                             ZR_SOURCE_DIR "/schema/exact/DHCPClientNeighbours.registration"};
     all.providerDirectories = {ZR_BINARY_DIR "/lib/cmpi"};
     return all;
 }

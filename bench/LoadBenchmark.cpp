@@ -43,7 +43,7 @@ void enterMachineOfFour() {
 cimom::Configuration configuration() {
     cimom::Configuration all;
     all.schemaDirectories = {ZR_SOURCE_DIR "/schema"};
-    all.registrationFiles = {ZR_SOURCE_DIR "/schema/DHCPClientProvider.registration"};
+    all.registrationFiles = {ZR_SOURCE_DIR "/schema/exact/DHCPClientProvider.registration"};
     all.providerDirectories = {ZR_BINARY_DIR "/lib/cmpi"};
     return all;
 }

@@ -143,7 +143,7 @@ cimom::Configuration machine(int interfaces) {
         << "INSTRUMENTATION_TREE=" << (directory / "tree.json").string() << "\nLOG_SINK=none\n";
     ::setenv("ZR_CONFIG", (directory / "platform.conf").c_str(), 1);
     return {{ZR_SOURCE_DIR "/schema"},
-            {ZR_SOURCE_DIR "/schema/DHCPClientProvider.registration"},
+            {ZR_SOURCE_DIR "/schema/exact/DHCPClientProvider.registration"},
             {DHCP_PROVIDER_DIR},
             "localhost"};
 }

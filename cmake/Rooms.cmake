@@ -107,15 +107,16 @@ function(zr_room name)
     zr_precompiled(${name})
 endfunction()
 
-# zr_provider_library(NAME OBJECTS target COMPONENT component EXPORTS symbol...)
-# A CMPI provider library, made of an object library, that exports exactly the
+# zr_provider_library(NAME OBJECTS target... COMPONENT component EXPORTS symbol...)
+# A CMPI provider library, made of object libraries, that exports exactly the
 # symbols named, and belongs to a component of the installation.
 function(zr_provider_library name)
     cmake_parse_arguments(LIBRARY "" "COMPONENT" "OBJECTS;EXPORTS" ${ARGN})
     set(map ${CMAKE_CURRENT_BINARY_DIR}/${name}.map)
     list(JOIN LIBRARY_EXPORTS "; " exports)
     file(CONFIGURE OUTPUT ${map} CONTENT "{ global: @exports@; local: *; };\n" @ONLY)
-    add_library(${name} MODULE $<TARGET_OBJECTS:${LIBRARY_OBJECTS}>)
+    list(TRANSFORM LIBRARY_OBJECTS REPLACE "(.+)" "$<TARGET_OBJECTS:\\1>" OUTPUT_VARIABLE sources)
+    add_library(${name} MODULE ${sources})
     target_link_libraries(${name} PRIVATE zr_options ${LIBRARY_OBJECTS})
     set_target_properties(${name} PROPERTIES LINK_DEPENDS ${map}
                           LIBRARY_OUTPUT_DIRECTORY ${PROJECT_BINARY_DIR}/lib/cmpi)

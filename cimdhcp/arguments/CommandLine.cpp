@@ -245,6 +245,9 @@ class CommandLineReader::Parser {
             ->type_name("DIR")
             ->envname("CIMDHCP_PROVIDER_DIR")
             ->group(advancedGroup);
+        app_.add_flag("--exact", line_.options.exact,
+                      "The exact provider, without the gateway in front of it")
+            ->group(advancedGroup);
     }
 
     /// A command whose arguments are read into a record of its own.

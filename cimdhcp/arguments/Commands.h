@@ -21,6 +21,7 @@ struct Options {
     std::optional<std::string> schemaDir;
     std::optional<std::string> registrationDir;
     std::optional<std::string> providerDir;
+    bool exact = false;  ///< the exact provider, without the gateway in front of it
 
     // The servers that are asked in place of the object manager of this process.
     std::vector<std::string> connect;  ///< URLs or hosts

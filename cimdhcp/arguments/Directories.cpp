@@ -48,6 +48,9 @@ Directories findDirectories(const Options& options, const std::vector<Directorie
                          "CIMDHCP_REGISTRATION_DIR");
         result.registrations = *options.registrationDir;
     }
+    if (options.exact) {
+        result.registrations /= "exact";
+    }
     if (options.providerDir) {
         requireDirectory(*options.providerDir, "--provider-dir", "CIMDHCP_PROVIDER_DIR");
         result.providers = {*options.providerDir};

@@ -52,6 +52,11 @@ void checkServers(const CommandLine& line) {
             "--tree and --data-dir are about this machine; they cannot be given "
             "with --connect or --hosts");
     }
+    if (options.exact) {
+        refuse(
+            "--exact is about the providers of this machine; it cannot be given with "
+            "--connect or --hosts");
+    }
     const auto* const rename = std::get_if<RenameCommand>(&line.command);
     if (rename != nullptr && rename->create) {
         refuse("--create cannot make files on other machines");

@@ -15,7 +15,7 @@ cimom::Configuration configuration() {
     ::setenv("ZR_INSTRUMENTATION_TREE", FUZZ_SOURCE_DIR "/docs/sample-machine.json", 1);
     const std::filesystem::path schema = FUZZ_SOURCE_DIR "/schema";
     return {{schema},
-            {schema / "DHCPClientProvider.registration"},
+            {schema / "exact/DHCPClientProvider.registration"},
             {FUZZ_BINARY_DIR "/lib/cmpi"},
             "testhost"};
 }

@@ -20,7 +20,7 @@ cat >"$work/tree.json" <<'TREE'
                         "AddressSource": 1, "InterfaceState": 1 } } ] } ] } ] }
 TREE
 ZR_LOG_SINK=file:$work/log ZR_LOG_LEVEL=3000 \
-    "$program" --tree "$work/tree.json" instances QVXZR_DHCPProtocolEndpoint >/dev/null
+    "$program" --exact --tree "$work/tree.json" instances QVXZR_DHCPProtocolEndpoint >/dev/null
 
 "$(dirname "$0")/without-accidents.sh" "$work" <"$work/log" >"$work/actual"
 if [[ ${UPDATE_EXPECTED:-} == yes ]]; then

@@ -43,7 +43,7 @@ ask() {
     printf '== %s\n' "$*" | tee -a "$work/log" >>"$work/trace"
     # A request that fails writes lines, too.
     ZR_LOG_SINK=file:$work/log ZR_LOG_LEVEL=0 ZR_TRACE_SINK=file:$work/trace ZR_TRACE_LEVEL=0 \
-        "$program" --tree "$work/tree.json" --data-dir "$work/data" "$@" >"$work/response" 2>&1 || true
+        "$program" --exact --tree "$work/tree.json" --data-dir "$work/data" "$@" >"$work/response" 2>&1 || true
 }
 
 # Standard input without the steps that were told before.

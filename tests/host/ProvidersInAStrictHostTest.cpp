@@ -33,8 +33,8 @@ constexpr const char* hosted = "QVXZR_HostedDHCPPoint";
 const std::string schemaDirectory = ZR_SOURCE_DIR "/schema";
 const std::string libraryDirectory = ZR_BINARY_DIR "/lib/cmpi";
 const std::vector<std::string> registrationFiles{
-    schemaDirectory + "/DHCPClientProvider.registration",
-    schemaDirectory + "/DHCPClientNeighbours.registration"};
+    schemaDirectory + "/exact/DHCPClientProvider.registration",
+    schemaDirectory + "/exact/DHCPClientNeighbours.registration"};
 
 class ProvidersInAStrictHostTest : public test::TreeTest {
   protected:

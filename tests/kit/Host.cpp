@@ -17,7 +17,8 @@ cimom::ClassRepository loadSchema() {
 std::unique_ptr<cimom::ObjectManager> manageNeighbours() {
     cimom::Configuration configuration;
     configuration.schemaDirectories = {ZR_SOURCE_DIR "/schema"};
-    configuration.registrationFiles = {ZR_SOURCE_DIR "/schema/DHCPClientNeighbours.registration"};
+    configuration.registrationFiles = {ZR_SOURCE_DIR
+                                       "/schema/exact/DHCPClientNeighbours.registration"};
     configuration.providerDirectories = {ZR_BINARY_DIR "/lib/cmpi"};
     return std::make_unique<cimom::ObjectManager>(configuration);
 }

@@ -3,6 +3,7 @@
 #include <dlfcn.h>
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <exception>
 #include <utility>
 
@@ -92,11 +93,11 @@ const CMPIContext* StrictHost::context(const std::string& nameSpace) const {
 }
 
 template <typename Record>
-void StrictHost::create(Library& library, const std::string& provider, const char* kind,
+void StrictHost::create(Provider& provider, const std::string& providerName, const char* kind,
                         Record*& record) {
     using Factory = Record* (*)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
-    const std::string name = provider + "_Create_" + kind + "MI";
-    const auto factory = reinterpret_cast<Factory>(::dlsym(library.handle, name.c_str()));
+    const std::string name = providerName + "_Create_" + kind + "MI";
+    const auto factory = reinterpret_cast<Factory>(::dlsym(provider.handle, name.c_str()));
     ASSERT_NE(factory, nullptr) << name;
     const RequestObjects objects;
     CMPIStatus status{CMPI_RC_OK, nullptr};
@@ -110,24 +111,24 @@ void StrictHost::create(Library& library, const std::string& provider, const cha
 
 void StrictHost::load() {
     for (const cimom::Registration& registration : registrations_) {
-        Library& library = libraries_[registration.location];
-        if (library.handle == nullptr) {
+        Provider& provider = providers_[registration.provider];
+        if (provider.handle == nullptr) {
+            provider.location = registration.location;
             const std::string file = directory_ + "/lib" + registration.location + ".so";
-            library.handle = ::dlopen(file.c_str(), flags_);
-            ASSERT_NE(library.handle, nullptr) << ::dlerror();
+            provider.handle = ::dlopen(file.c_str(), flags_);
+            ASSERT_NE(provider.handle, nullptr) << ::dlerror();
         }
         if (registration.instance) {
-            create(library, registration.provider, "Instance", library.instance);
+            create(provider, registration.provider, "Instance", provider.instance);
         }
         if (registration.association) {
-            create(library, registration.provider, "Association", library.association);
+            create(provider, registration.provider, "Association", provider.association);
         }
     }
 }
 
 bool StrictHost::unload(bool terminating) {
-    bool gone = true;
-    for (auto& [location, library] : libraries_) {
+    for (auto& [name, provider] : providers_) {
         const RequestObjects objects;
         const auto cleanUp = [&](auto* record) {
             if (record != nullptr) {
@@ -137,21 +138,29 @@ bool StrictHost::unload(bool terminating) {
                 EXPECT_EQ(status.rc, CMPI_RC_OK);
             }
         };
-        cleanUp(library.instance);
-        cleanUp(library.association);
-        EXPECT_EQ(::dlclose(library.handle), 0);
-        const std::string file = directory_ + "/lib" + location + ".so";
+        cleanUp(provider.instance);
+        cleanUp(provider.association);
+    }
+    for (auto& [name, provider] : providers_) {
+        EXPECT_EQ(::dlclose(provider.handle), 0);
+    }
+    bool gone = true;
+    for (auto& [name, provider] : providers_) {
+        const std::string file = directory_ + "/lib" + provider.location + ".so";
         if (void* still = ::dlopen(file.c_str(), RTLD_NOW | RTLD_NOLOAD)) {
             ::dlclose(still);
             gone = false;
         }
     }
-    libraries_.clear();
+    providers_.clear();
     return gone;
 }
 
 void* StrictHost::symbol(const std::string& location, const std::string& name) const {
-    return ::dlsym(libraries_.at(location).handle, name.c_str());
+    const auto found = std::find_if(providers_.begin(), providers_.end(), [&](const auto& entry) {
+        return entry.second.location == location;
+    });
+    return found == providers_.end() ? nullptr : ::dlsym(found->second.handle, name.c_str());
 }
 
 StrictHost::Response StrictHost::request(Kind kind, const cimom::ObjectPath& path,
@@ -169,10 +178,10 @@ StrictHost::Response StrictHost::request(Kind kind, const cimom::ObjectPath& pat
     return {CMPI_RC_OK, std::move(result->paths), std::move(result->instances)};
 }
 
-const StrictHost::Library* StrictHost::serving(const std::string& className) const {
+const StrictHost::Provider* StrictHost::serving(const std::string& className) const {
     for (const cimom::Registration& registration : registrations_) {
         if (cimom::sameName(registration.className, className)) {
-            return &libraries_.at(registration.location);
+            return &providers_.at(registration.provider);
         }
     }
     return nullptr;
@@ -180,7 +189,7 @@ const StrictHost::Library* StrictHost::serving(const std::string& className) con
 
 StrictHost::Response StrictHost::eachClass(
     Kind kind, const cimom::ObjectPath& path,
-    const std::function<CMPIStatus(const Library&, const CMPIContext*, const CMPIResult*,
+    const std::function<CMPIStatus(const Provider&, const CMPIContext*, const CMPIResult*,
                                    const CMPIObjectPath*)>& call) {
     Response all;
     for (const cimom::Registration& registration : registrations_) {
@@ -189,26 +198,26 @@ StrictHost::Response StrictHost::eachClass(
         }
         cimom::ObjectPath ofSubclass = path;
         ofSubclass.className = registration.className;
-        const Library& library = libraries_.at(registration.location);
+        const Provider& provider = providers_.at(registration.provider);
         append(all, request(kind, ofSubclass, [&](auto* context, auto* result, auto* record) {
-                   return call(library, context, result, record);
+                   return call(provider, context, result, record);
                }));
     }
     return all;
 }
 
 StrictHost::Response StrictHost::enumerateNames(const cimom::ObjectPath& path) {
-    return eachClass(Kind::paths, path, [](auto& library, auto* context, auto* result, auto* op) {
-        return callSlot("enumerateInstanceNames", library.instance->ft->enumerateInstanceNames,
-                        library.instance, context, result, op);
+    return eachClass(Kind::paths, path, [](auto& provider, auto* context, auto* result, auto* op) {
+        return callSlot("enumerateInstanceNames", provider.instance->ft->enumerateInstanceNames,
+                        provider.instance, context, result, op);
     });
 }
 
 StrictHost::Response StrictHost::enumerate(const cimom::ObjectPath& path, const char** properties) {
     return eachClass(
-        Kind::instances, path, [=](auto& library, auto* context, auto* result, auto* op) {
-            return callSlot("enumerateInstances", library.instance->ft->enumerateInstances,
-                            library.instance, context, result, op, properties);
+        Kind::instances, path, [=](auto& provider, auto* context, auto* result, auto* op) {
+            return callSlot("enumerateInstances", provider.instance->ft->enumerateInstances,
+                            provider.instance, context, result, op, properties);
         });
 }
 
@@ -216,12 +225,12 @@ StrictHost::Response StrictHost::ofClass(
     Kind kind, const cimom::ObjectPath& path,
     const std::function<CMPIStatus(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
                                    const CMPIObjectPath*)>& call) {
-    const Library* library = serving(path.className);
-    if (library == nullptr) {
+    const Provider* provider = serving(path.className);
+    if (provider == nullptr) {
         return {CMPI_RC_ERR_NOT_SUPPORTED, {}, {}};
     }
     return request(kind, path, [&](auto* context, auto* result, auto* op) {
-        return call(library->instance, context, result, op);
+        return call(provider->instance, context, result, op);
     });
 }
 
@@ -269,7 +278,7 @@ StrictHost::Response StrictHost::eachAssociator(
     const std::function<CMPIStatus(CMPIAssociationMI*, const CMPIContext*, const CMPIResult*,
                                    const CMPIObjectPath*)>& call) {
     Response all;
-    for (const auto& entry : libraries_) {
+    for (const auto& entry : providers_) {
         CMPIAssociationMI* mi = entry.second.association;
         if (mi != nullptr) {
             append(all, request(kind, path, [&](auto* context, auto* result, auto* op) {

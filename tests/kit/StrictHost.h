@@ -88,20 +88,22 @@ class StrictHost {
     [[nodiscard]] const CMPIBroker* broker() const { return &broker_; }
 
   private:
-    struct Library {
+    /// A provider, in a library that may hold others, too.
+    struct Provider {
+        std::string location;
         void* handle = nullptr;
         CMPIInstanceMI* instance = nullptr;
         CMPIAssociationMI* association = nullptr;
     };
 
     template <typename Record>
-    void create(Library& library, const std::string& provider, const char* kind, Record*& record);
-    /// The library of a class that is registered itself.
-    const Library* serving(const std::string& className) const;
+    void create(Provider& provider, const std::string& name, const char* kind, Record*& record);
+    /// The provider of a class that is registered itself.
+    const Provider* serving(const std::string& className) const;
     /// Calls the provider of each registered class at or below the path's, with that class.
     Response eachClass(
         ResultObject::Kind kind, const cimom::ObjectPath& path,
-        const std::function<CMPIStatus(const Library&, const CMPIContext*, const CMPIResult*,
+        const std::function<CMPIStatus(const Provider&, const CMPIContext*, const CMPIResult*,
                                        const CMPIObjectPath*)>& call);
     /// Calls each provider of associations once.
     Response eachAssociator(
@@ -121,7 +123,7 @@ class StrictHost {
     int flags_;
     Contexts contexts_;
     CMPIBroker broker_;
-    std::map<std::string, Library> libraries_;  ///< by location
+    std::map<std::string, Provider> providers_;  ///< by name
 };
 
 }  // namespace strict

@@ -354,7 +354,8 @@ class NeighboursLibraryTest : public test::TreeTest {
     static cimom::Configuration configuration() {
         cimom::Configuration result;
         result.schemaDirectories = {ZR_SOURCE_DIR "/schema"};
-        result.registrationFiles = {ZR_SOURCE_DIR "/schema/DHCPClientNeighbours.registration"};
+        result.registrationFiles = {ZR_SOURCE_DIR
+                                    "/schema/exact/DHCPClientNeighbours.registration"};
         result.providerDirectories = {ZR_BINARY_DIR "/lib/cmpi"};
         return result;
     }

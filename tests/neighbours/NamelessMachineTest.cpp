@@ -24,8 +24,8 @@ using ::testing::HasSubstr;
 cimom::Configuration bothProviders() {
     cimom::Configuration result;
     result.schemaDirectories = {ZR_SOURCE_DIR "/schema"};
-    result.registrationFiles = {ZR_SOURCE_DIR "/schema/DHCPClientProvider.registration",
-                                ZR_SOURCE_DIR "/schema/DHCPClientNeighbours.registration"};
+    result.registrationFiles = {ZR_SOURCE_DIR "/schema/exact/DHCPClientProvider.registration",
+                                ZR_SOURCE_DIR "/schema/exact/DHCPClientNeighbours.registration"};
     result.providerDirectories = {ZR_BINARY_DIR "/lib/cmpi"};
     return result;
 }

@@ -96,17 +96,17 @@ TEST_F(Check, TellsOfAMissingLibrary) {
     const Ended ended = check({"--provider-dir", emptyDirectory()});
     EXPECT_EQ(ended.status, 1);
     EXPECT_THAT(ended.out,
-                HasSubstr("BAD   library: libDHCPClientProvider.so is not in " + emptyDirectory()));
+                HasSubstr("BAD   library: libDHCPClient.so is not in " + emptyDirectory()));
     EXPECT_THAT(ended.out, HasSubstr("BAD   QVXZR_DHCPProtocolEndpoint: CIM_ERR_FAILED"));
 }
 
 TEST_F(Check, TellsOfALibraryWithoutFactories) {
-    fs::copy(NO_PROVIDER_LIBRARY, emptyDirectory() + "/libDHCPClientProvider.so");
+    fs::copy(NO_PROVIDER_LIBRARY, emptyDirectory() + "/libDHCPClient.so");
     const Ended ended = check({"--provider-dir", emptyDirectory()});
     EXPECT_EQ(ended.status, 1);
     EXPECT_THAT(ended.out, HasSubstr("BAD   instance factory: "));
     EXPECT_THAT(ended.out, HasSubstr("BAD   association factory: "));
-    EXPECT_THAT(ended.out, HasSubstr("DHCPClientProvider_Create_AssociationMI"));
+    EXPECT_THAT(ended.out, HasSubstr("DHCPClientGateway_Create_AssociationMI"));
 }
 
 TEST_F(Check, TellsOfAFaultInSchemaOrRegistration) {

@@ -34,7 +34,7 @@ TEST_F(Installation, IsFoundBesideTheExecutable) {
     fs::create_directories(prefix + "/lib/cmpi");
     fs::create_directories(prefix + "/share/dhcp-client-provider");
     fs::copy(program(), prefix + "/bin/cimdhcp");
-    fs::copy(PROVIDER_LIBRARY, prefix + "/lib/cmpi/libDHCPClientProvider.so");
+    fs::copy(PROVIDER_LIBRARY, prefix + "/lib/cmpi/libDHCPClient.so");
     const fs::path build = fs::path(program()).parent_path().parent_path();
     fs::copy(build / "share/dhcp-client-provider/schema",
              prefix + "/share/dhcp-client-provider/schema", fs::copy_options::recursive);
@@ -43,7 +43,7 @@ TEST_F(Installation, IsFoundBesideTheExecutable) {
     };
     EXPECT_EQ(runThere(), expected_);
     // It was this library indeed.
-    fs::remove(prefix + "/lib/cmpi/libDHCPClientProvider.so");
+    fs::remove(prefix + "/lib/cmpi/libDHCPClient.so");
     EXPECT_EQ(runThere().status, 3);
 }
 
@@ -71,8 +71,8 @@ TEST_F(Installation, CanBeNamedInTheEnvironment) {
 
 TEST_F(Installation, WithoutTheLibraryIsStatusThree) {
     const std::string empty = emptyDirectory("empty");
-    const Ended missing{
-        3, "", "cimdhcp: CIM_ERR_FAILED: libDHCPClientProvider.so: not found in " + empty + "\n"};
+    const Ended missing{3, "",
+                        "cimdhcp: CIM_ERR_FAILED: libDHCPClient.so: not found in " + empty + "\n"};
     EXPECT_EQ(with("--provider-dir", empty), missing);
     EXPECT_EQ(run({"--provider-dir", empty, "show"}), missing);
     EXPECT_EQ(run({"--provider-dir", empty, "rename", "eth0", "x"}), missing);
@@ -82,7 +82,7 @@ TEST_F(Installation, WithoutTheLibraryIsStatusThree) {
 
 TEST_F(Installation, WithALibraryThatCannotBeLoadedIsStatusThree) {
     const std::string broken = emptyDirectory("broken");
-    const std::string library = broken + "/libDHCPClientProvider.so";
+    const std::string library = broken + "/libDHCPClient.so";
     writeFile(library, "this is no library");
     Ended ended = with("--provider-dir", broken);
     EXPECT_EQ(ended.status, 3);
@@ -93,7 +93,7 @@ TEST_F(Installation, WithALibraryThatCannotBeLoadedIsStatusThree) {
     fs::copy(NO_PROVIDER_LIBRARY, library);
     ended = with("--provider-dir", broken);
     EXPECT_EQ(ended.status, 3);
-    EXPECT_NE(ended.err.find(library + ": neither DHCPClientProvider_Create_InstanceMI nor"),
+    EXPECT_NE(ended.err.find(library + ": neither DHCPClientGateway_Create_InstanceMI nor"),
               std::string::npos)
         << ended.err;
 }
