@@ -42,8 +42,9 @@ struct ProviderUtilities {
     [[nodiscard]] static CMPIInstance* createInstance(const CMPIBroker* broker,
                                                       const CMPIObjectPath* path);
 
-    // Keys. A key is read as text only when it is one, as a reference only when
-    // it is one. A null reference adds no key.
+    // Keys. Only those with a value count, whatever the host counts, and a path is never
+    // asked for one by name. A key is read as text only when it is one, as a reference
+    // only when it is one. A null reference adds no key.
     [[nodiscard]] static unsigned int getKeyCount(const CMPIObjectPath* path);
     static bool getKeyProperty(const CMPIObjectPath* path, const char* name, std::string& value);
     static bool getKeyProperty(const CMPIObjectPath* path, const char* name,
