@@ -51,13 +51,22 @@ inline void PrintTo(const InterfaceName& name, std::ostream* out) {
     *out << name.view();
 }
 
-/// A captured file of a real client.
+/// A captured file of a real client, by "MACHINE/FILE": a file of a directory, or what
+/// stands under its name in MACHINE.txt, where tail(1) has put the files one after the other.
 inline std::string sample(const std::string& name) {
-    auto content = File::read(ZR_LIVE_SAMPLES "/" + name);
-    if (!content) {
+    if (auto content = File::read(ZR_LIVE_SAMPLES "/" + name)) {
+        return *std::move(content);
+    }
+    const std::size_t slash = name.find('/');
+    const auto all = File::read(ZR_LIVE_SAMPLES "/" + name.substr(0, slash) + ".txt");
+    const std::string heading = "==> " + name.substr(slash + 1) + " <==\n";
+    const std::size_t begin = all ? all->find(heading) : std::string::npos;
+    if (begin == std::string::npos) {
         throw std::runtime_error("no sample " + name);
     }
-    return *std::move(content);
+    const std::size_t end = all->find("\n\n==> ", begin);
+    return all->substr(begin + heading.size(),
+                       end == std::string::npos ? end : end + 1 - begin - heading.size());
 }
 
 using Testing::TemporaryDirectory;
