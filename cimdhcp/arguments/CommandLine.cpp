@@ -257,7 +257,7 @@ class CommandLineReader::Parser {
             ->envname("CIMDHCP_CIM_SCHEMA")
             ->group(advancedGroup);
         app_.add_flag("--exact", line_.options.exact,
-                      "The exact provider, without the gateway in front of it")
+                      "The exact provider, not the gateway before it")
             ->group(advancedGroup);
     }
 

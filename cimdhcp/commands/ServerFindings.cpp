@@ -196,7 +196,8 @@ class Examination {
     void enumerate(const ServedClass& each) {
         const Response response = client_.enumerate(client_.classPath(std::string(each.name)));
         if (!response.status.ok()) {
-            tellOfFailure(each.name, response.status);
+            addAlike(Verdict::bad, each.name, statusText(response.status),
+                     remedyFor(response.status));
             return;
         }
         Served served{&each, {}};
@@ -208,13 +209,14 @@ class Examination {
         served_.push_back(std::move(served));
     }
 
-    /// The same failure of several classes is one thing that is wrong.
-    void tellOfFailure(std::string_view className, const cimom::Status& status) {
-        const std::string text = statusText(status);
-        const auto same = std::find_if(findings_.begin(), findings_.end(),
-                                       [&](const Finding& each) { return each.detail == text; });
+    /// What is the same about several classes is one finding.
+    void addAlike(Verdict verdict, std::string_view className, const std::string& detail,
+                  const char* remedy) {
+        const auto same = std::find_if(
+            findings_.begin(), findings_.end(),
+            [&](const Finding& each) { return each.verdict == verdict && each.detail == detail; });
         if (same == findings_.end()) {
-            add(Verdict::bad, className, text, remedyFor(status));
+            add(verdict, className, detail, remedy);
         } else {
             same->what += ", " + std::string(className);
         }
@@ -259,8 +261,8 @@ class Examination {
 
     void tellOfNone(const ServedClass& served) {
         if (served.mayBeNone) {
-            add(Verdict::notable, served.name, "no instance",
-                "\"cimdhcp check\" on that machine tells why, if it should have one");
+            addAlike(Verdict::notable, served.name, "no instance",
+                     "\"cimdhcp check\" on that machine tells why, if it should have one");
         } else {
             add(Verdict::bad, served.name, "no instance, and every machine has one",
                 registerNeighbours);

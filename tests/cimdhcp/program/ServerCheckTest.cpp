@@ -56,12 +56,12 @@ TEST_F(ServerCheck, TellsOfANamespaceThatIsNotServed) {
 }
 
 TEST_F(ServerCheck, TellsOfALibraryThatTheServerDoesNotFind) {
-    const std::string response = test::httpResponse(test::cimResponse(
-        "EnumerateInstances",
-        "<ERROR CODE=\"6\" DESCRIPTION=\"Provider not found or not loadable\"/>"));
+    const std::string response =
+        test::cimResponse("EnumerateInstances",
+                          "<ERROR CODE=\"6\" DESCRIPTION=\"Provider not found or not loadable\"/>");
     const test::RawServer server(std::vector<std::string>(15, response));
     const Ended ended = runAs(program(), {"--format", "json", "--connect", server.url(), "check"});
-    EXPECT_EQ(ended.status, 1);
+    EXPECT_EQ(ended.status, 1) << ended.err;
     const auto findings = nlohmann::json::parse(ended.out).at("findings");
     ASSERT_EQ(findings.size(), 1U);
     EXPECT_EQ(findings[0].at("verdict"), "bad");
