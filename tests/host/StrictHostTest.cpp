@@ -4,6 +4,8 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include "kit/FullSchema.h"
+
 namespace {
 
 using strict::ResultObject;
@@ -12,11 +14,13 @@ using ::testing::ElementsAre;
 using ::testing::HasSubstr;
 using ::testing::IsEmpty;
 
+constexpr const char* capabilities = "QVXZR_DHCPCapabilities";
+
 class StrictHostTest : public ::testing::Test {
   protected:
     /// Runs `call` as a provider would, and gives what was noted.
     std::vector<std::string> noted(ResultObject::Kind kind, const StrictHost::Call& call) {
-        host_.request(kind, {"", "root/cimv2", "QVXZR_DHCPCapabilities", {}}, call);
+        host_.request(kind, {"", "root/cimv2", capabilities, {}}, call);
         return strict::violations().take();
     }
 
@@ -28,8 +32,13 @@ class StrictHostTest : public ::testing::Test {
 
     static constexpr CMPIStatus ok{CMPI_RC_OK, nullptr};
 
-    // Without registrations, and so without providers.
-    StrictHost host_{ZR_SOURCE_DIR "/schema", {}, ZR_BINARY_DIR "/lib/cmpi"};
+    /// Without registrations, and so without providers.
+    static StrictHost makeHost(const strict::Traits& traits = {},
+                               const std::string& schema = ZR_SOURCE_DIR "/schema") {
+        return {schema, {}, ZR_BINARY_DIR "/lib/cmpi", traits};
+    }
+
+    StrictHost host_ = makeHost();
     const CMPIBroker* broker_ = host_.broker();
 };
 
@@ -122,6 +131,94 @@ TEST_F(StrictHostTest, AFineAnswerIsNotNoted) {
                           return ok;
                       }),
                 IsEmpty());
+}
+
+TEST_F(StrictHostTest, NoValueIsTheNullOfAProperty) {
+    StrictHost::Response response = host_.request(
+        ResultObject::Kind::instances, {"", "root/cimv2", capabilities, {}},
+        [&](auto*, auto* result, auto*) {
+            CMPIObjectPath* path =
+                broker_->eft->newObjectPath(broker_, "root/cimv2", capabilities, nullptr);
+            const CMPIValue id = text("eth0");
+            path->ft->addKey(path, "InstanceID", &id, CMPI_string);
+            CMPIInstance* instance = broker_->eft->newInstance(broker_, path, nullptr);
+            instance->ft->setProperty(instance, "ElementName", nullptr, CMPI_string);
+            EXPECT_EQ(instance->ft->getPropertyCount(instance, nullptr), 1U);
+            const CMPIData data = instance->ft->getPropertyAt(instance, 0, nullptr, nullptr);
+            EXPECT_EQ(data.state, CMPI_nullValue);
+            result->ft->returnInstance(result, instance);
+            return ok;
+        });
+    EXPECT_THAT(strict::violations().take(), IsEmpty());
+    ASSERT_EQ(response.instances.size(), 1U);
+    ASSERT_NE(response.instances[0].property("ElementName"), nullptr);
+    EXPECT_TRUE(response.instances[0].property("ElementName")->isNull());
+}
+
+TEST_F(StrictHostTest, TheMessageOfAStatusIsPartOfTheResponse) {
+    const StrictHost::Response response =
+        host_.request(ResultObject::Kind::nothing, {"", "root/cimv2", capabilities, {}},
+                      [&](auto*, auto*, auto*) {
+                          return CMPIStatus{CMPI_RC_ERR_FAILED, text("a reason").string};
+                      });
+    EXPECT_EQ(response.code, CMPI_RC_ERR_FAILED);
+    EXPECT_EQ(response.message, "a reason");
+}
+
+// The traits.
+
+TEST_F(StrictHostTest, DeclaredKeysAreCountedAndMustNotBeAskedForByName) {
+    const auto look = [](auto*, auto*, const CMPIObjectPath* path) {
+        EXPECT_EQ(path->ft->getKeyCount(path, nullptr), 1U);
+        CMPIString* name = nullptr;
+        CMPIStatus status{CMPI_RC_ERR_FAILED, nullptr};
+        EXPECT_EQ(path->ft->getKeyAt(path, 0, &name, &status).state, CMPI_nullValue);
+        EXPECT_EQ(status.rc, CMPI_RC_OK);
+        EXPECT_STREQ(name->ft->getCharPtr(name, nullptr), "InstanceID");
+        path->ft->getKey(path, "InstanceID", nullptr);
+        return ok;
+    };
+    StrictHost declaring = makeHost({.declaredKeys = true});
+    declaring.request(ResultObject::Kind::nothing, {"", "root/cimv2", capabilities, {}}, look);
+    EXPECT_THAT(strict::violations().take(),
+                ElementsAre("getKey reads out of bounds: the path has no InstanceID"));
+    EXPECT_THAT(noted(ResultObject::Kind::nothing,
+                      [](auto*, auto*, const CMPIObjectPath* path) {
+                          EXPECT_EQ(path->ft->getKeyCount(path, nullptr), 0U);
+                          path->ft->getKey(path, "InstanceID", nullptr);
+                          return ok;
+                      }),
+                IsEmpty());
+}
+
+TEST_F(StrictHostTest, DefaultsOfParentsAreShownWhereNullIsNoInitialiser) {
+    const auto shown = [](StrictHost& host) {
+        StrictHost::Response response = host.request(
+            ResultObject::Kind::instances, {"", "root/cimv2", capabilities, {}},
+            [&host](auto*, auto* result, auto*) {
+                const CMPIBroker* broker = host.broker();
+                const CMPIObjectPath* path = broker->eft->newObjectPath(
+                    broker, "root/cimv2", "QVXZR_DHCPProtocolEndpoint", nullptr);
+                result->ft->returnInstance(result, broker->eft->newInstance(broker, path, nullptr));
+                return ok;
+            });
+        // Its keys are not what this is about.
+        EXPECT_THAT(strict::violations().take(), ::testing::SizeIs(4));
+        const cimom::Value* value = response.instances.at(0).property("RequestedState");
+        const cimom::Scalar* scalar = value == nullptr ? nullptr : value->scalar();
+        return scalar == nullptr ? 0U : std::get<std::uint64_t>(*scalar);
+    };
+    const test::FullSchema schema;
+    StrictHost parents = makeHost({.parentsDefaults = true}, schema.path());
+    EXPECT_EQ(shown(parents), 12U);
+    StrictHost plain = makeHost({}, schema.path());
+    EXPECT_EQ(shown(plain), 0U);
+}
+
+TEST_F(StrictHostTest, TheBrokerTellsItsVersionOrNone) {
+    const StrictHost telling = makeHost({.tellsItsVersion = true});
+    EXPECT_EQ(telling.broker()->bft->brokerVersion, 200);
+    EXPECT_EQ(broker_->bft->brokerVersion, 0);
 }
 
 }  // namespace

@@ -50,12 +50,13 @@ CMPIString* newString(const CMPIBroker* broker, const char* text, CMPIStatus* st
 }
 
 CMPIArray* newArray(const CMPIBroker* broker, CMPICount size, CMPIType type, CMPIStatus* status) {
-    if (hostOf(broker, "newArray") == nullptr) {
+    const StrictHost* host = hostOf(broker, "newArray");
+    if (host == nullptr) {
         setStatus(status, CMPI_RC_ERR_INVALID_HANDLE);
         return nullptr;
     }
     setStatus(status, CMPI_RC_OK);
-    return RequestObjects::make<ArrayObject>(size, type);
+    return RequestObjects::make<ArrayObject>(host->repository(), size, type);
 }
 
 /// An unknown class equals itself alone, and without namespace no class has parents.
@@ -119,13 +120,18 @@ CMPIInstance* getInstance(const CMPIBroker* broker, const CMPIContext* context,
 
 // The rest is null: what no provider of ours needs, SFCB's or OpenPegasus' broker may lack.
 
-const CMPIBrokerFT functions = [] {
+CMPIBrokerFT makeFunctions(unsigned int version) {
     CMPIBrokerFT table{};
+    table.brokerVersion = version;
     table.brokerName = "strict";
     table.enumerateInstances = &enumerateInstances;
     table.getInstance = &getInstance;
     return table;
-}();
+}
+
+constexpr unsigned int version200 = 200;
+const CMPIBrokerFT functions = makeFunctions(0);
+const CMPIBrokerFT functionsThatTellTheirVersion = makeFunctions(version200);
 
 const CMPIBrokerEncFT encapsulation = [] {
     CMPIBrokerEncFT table{};
@@ -143,8 +149,9 @@ const CMPIBrokerMemFT memory{};
 
 }  // namespace
 
-CMPIBroker strictBroker(StrictHost& host) {
-    return {&host, &functions, &encapsulation, &extension, &memory};
+CMPIBroker strictBroker(StrictHost& host, const Traits& traits) {
+    return {&host, traits.tellsItsVersion ? &functionsThatTellTheirVersion : &functions,
+            &encapsulation, &extension, &memory};
 }
 
 }  // namespace strict

@@ -5,9 +5,9 @@
 namespace strict {
 
 class StrictHost;
+struct Traits;
 
-/// The broker of a strict host: it tells version 0, and slots that are null in some
-/// object manager are null in it.
-CMPIBroker strictBroker(StrictHost& host);
+/// The broker of a strict host: slots that are null in some object manager are null in it.
+CMPIBroker strictBroker(StrictHost& host, const Traits& traits);
 
 }  // namespace strict

@@ -50,7 +50,8 @@ CMPIStatus callSlot(const char* name, Slot slot, Arguments... arguments) {
 void append(StrictHost::Response& all, StrictHost::Response one) {
     // The first error is the result, and what was handed over before it is discarded.
     if (all.code != CMPI_RC_OK || one.code != CMPI_RC_OK) {
-        all = {all.code == CMPI_RC_OK ? one.code : all.code, {}, {}};
+        const StrictHost::Response& failed = all.code == CMPI_RC_OK ? one : all;
+        all = {failed.code, failed.message, {}, {}};
         return;
     }
     all.paths.insert(all.paths.end(), one.paths.begin(), one.paths.end());
@@ -61,13 +62,12 @@ void append(StrictHost::Response& all, StrictHost::Response one) {
 
 StrictHost::StrictHost(const std::string& schemaDirectory,
                        const std::vector<std::string>& registrations, std::string libraryDirectory,
-                       Binding binding, Contexts contexts)
+                       const Traits& traits)
     : repository_(loadSchema(schemaDirectory)),
       registrations_(readAll(registrations)),
       directory_(std::move(libraryDirectory)),
-      flags_(RTLD_GLOBAL | (binding == Binding::now ? RTLD_NOW : RTLD_LAZY)),
-      contexts_(contexts),
-      broker_(strictBroker(*this)) {
+      traits_(traits),
+      broker_(strictBroker(*this, traits)) {
     load();
 }
 
@@ -81,7 +81,7 @@ StrictHost& StrictHost::of(const CMPIBroker* broker) {
 
 const CMPIContext* StrictHost::context(const std::string& nameSpace) const {
     std::vector<cimom::NamedValue> entries;
-    if (contexts_ == Contexts::filled) {
+    if (!traits_.emptyContexts) {
         cimom::Value flags;
         flags.type = cimom::Type::uint32;
         flags.content = cimom::Scalar(std::uint64_t{0});
@@ -99,7 +99,7 @@ void StrictHost::create(Provider& provider, const std::string& providerName, con
     const std::string name = providerName + "_Create_" + kind + "MI";
     const auto factory = reinterpret_cast<Factory>(::dlsym(provider.handle, name.c_str()));
     ASSERT_NE(factory, nullptr) << name;
-    const RequestObjects objects;
+    const RequestObjects objects(traits_);
     CMPIStatus status{CMPI_RC_OK, nullptr};
     Record* made = factory(&broker_, context("root/cimv2"), &status);
     ASSERT_NE(made, nullptr) << name;
@@ -115,7 +115,8 @@ void StrictHost::load() {
         if (provider.handle == nullptr) {
             provider.location = registration.location;
             const std::string file = directory_ + "/lib" + registration.location + ".so";
-            provider.handle = ::dlopen(file.c_str(), flags_);
+            provider.handle =
+                ::dlopen(file.c_str(), RTLD_GLOBAL | (traits_.lateBinding ? RTLD_LAZY : RTLD_NOW));
             ASSERT_NE(provider.handle, nullptr) << ::dlerror();
         }
         if (registration.instance) {
@@ -129,7 +130,7 @@ void StrictHost::load() {
 
 bool StrictHost::unload(bool terminating) {
     for (auto& [name, provider] : providers_) {
-        const RequestObjects objects;
+        const RequestObjects objects(traits_);
         const auto cleanUp = [&](auto* record) {
             if (record != nullptr) {
                 const CMPIStatus status =
@@ -165,17 +166,20 @@ void* StrictHost::symbol(const std::string& location, const std::string& name) c
 
 StrictHost::Response StrictHost::request(Kind kind, const cimom::ObjectPath& path,
                                          const Call& call) {
-    const RequestObjects objects;
+    const RequestObjects objects(traits_);
     auto* result = RequestObjects::make<ResultObject>(repository_, kind);
     const CMPIStatus status =
         call(context(path.nameSpace), result, RequestObjects::make<PathObject>(repository_, path));
+    std::string message;
     if (status.msg != nullptr) {
-        RequestObjects::get<StringObject>(status.msg, "The status");
+        if (const auto* text = RequestObjects::get<StringObject>(status.msg, "The status")) {
+            message = text->text;
+        }
     }
     if (status.rc != CMPI_RC_OK) {
-        return {status.rc, {}, {}};
+        return {status.rc, std::move(message), {}, {}};
     }
-    return {CMPI_RC_OK, std::move(result->paths), std::move(result->instances)};
+    return {CMPI_RC_OK, std::move(message), std::move(result->paths), std::move(result->instances)};
 }
 
 const StrictHost::Provider* StrictHost::serving(const std::string& className) const {
@@ -227,7 +231,7 @@ StrictHost::Response StrictHost::ofClass(
                                    const CMPIObjectPath*)>& call) {
     const Provider* provider = serving(path.className);
     if (provider == nullptr) {
-        return {CMPI_RC_ERR_NOT_SUPPORTED, {}, {}};
+        return {CMPI_RC_ERR_NOT_SUPPORTED, "", {}, {}};
     }
     return request(kind, path, [&](auto* context, auto* result, auto* op) {
         return call(provider->instance, context, result, op);
@@ -235,9 +239,15 @@ StrictHost::Response StrictHost::ofClass(
 }
 
 StrictHost::Response StrictHost::get(const cimom::ObjectPath& path, const char** properties) {
-    return ofClass(Kind::instances, path, [=](auto* mi, auto* context, auto* result, auto* op) {
-        return callSlot("getInstance", mi->ft->getInstance, mi, context, result, op, properties);
-    });
+    Response response =
+        ofClass(Kind::instances, path, [=](auto* mi, auto* context, auto* result, auto* op) {
+            return callSlot("getInstance", mi->ft->getInstance, mi, context, result, op,
+                            properties);
+        });
+    if (traits_.firstInstance && response.instances.size() > 1) {
+        response.instances.erase(response.instances.begin() + 1, response.instances.end());
+    }
+    return response;
 }
 
 StrictHost::Response StrictHost::create(const cimom::Instance& instance) {

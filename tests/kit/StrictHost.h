@@ -10,6 +10,7 @@
 #include "cimom/ClassRepository.h"
 #include "cimom/ObjectManager.h"
 #include "kit/StrictObjects.h"
+#include "kit/StrictTraits.h"
 
 namespace strict {
 
@@ -24,20 +25,15 @@ namespace strict {
 /// Requests may come from many threads; loading and unloading may not.
 class StrictHost {
   public:
-    /// Whether symbols are bound when a library is opened, or when they are used.
-    enum class Binding { now, lazy };
-    /// Whether contexts have their usual entries, or none.
-    enum class Contexts { filled, empty };
-
     struct Response {
         CMPIrc code = CMPI_RC_OK;
+        std::string message;  ///< of the status; empty when it has none
         std::vector<cimom::ObjectPath> paths;
         std::vector<cimom::Instance> instances;
     };
 
     StrictHost(const std::string& schemaDirectory, const std::vector<std::string>& registrations,
-               std::string libraryDirectory, Binding binding = Binding::now,
-               Contexts contexts = Contexts::filled);
+               std::string libraryDirectory, const Traits& traits = {});
     ~StrictHost();
     StrictHost(const StrictHost&) = delete;
     StrictHost& operator=(const StrictHost&) = delete;
@@ -120,8 +116,7 @@ class StrictHost {
     cimom::ClassRepository repository_;
     std::vector<cimom::Registration> registrations_;
     std::string directory_;
-    int flags_;
-    Contexts contexts_;
+    Traits traits_;
     CMPIBroker broker_;
     std::map<std::string, Provider> providers_;  ///< by name
 };

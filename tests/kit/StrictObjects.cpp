@@ -1,5 +1,6 @@
 #include "kit/StrictObjects.h"
 
+#include "cimom/ClassDeclaration.h"
 #include "cimom/ObjectPathText.h"
 #include "kit/StrictValues.h"
 
@@ -26,10 +27,16 @@ Violations& violations() {
     return instance;
 }
 
-RequestObjects::RequestObjects() : outer_(std::exchange(current, this)) {}
+RequestObjects::RequestObjects(const Traits& traits)
+    : traits_(traits), outer_(std::exchange(current, this)) {}
 
 RequestObjects::~RequestObjects() {
     current = outer_;
+}
+
+const Traits& RequestObjects::traits() {
+    static constexpr Traits plain{};
+    return current == nullptr ? plain : current->traits_;
 }
 
 void RequestObjects::note(const char* function, const char* violation) {
@@ -41,7 +48,7 @@ void RequestObjects::keep(const void* record, std::shared_ptr<void> object) {
     if (current == nullptr) {
         violations().add("An object is made outside of any request");
         // It has to live somewhere; the test fails anyway.
-        static RequestObjects strays;
+        static RequestObjects strays{Traits{}};
         strays.objects_.emplace(record, std::move(object));
         return;
     }
@@ -99,6 +106,30 @@ CMPIStatus setElementAt(const CMPIArray* array, CMPICount index, const CMPIValue
     return {CMPI_RC_OK, nullptr};
 }
 
+CMPICount getSize(const CMPIArray* array, CMPIStatus* status) {
+    const ArrayObject* object = RequestObjects::get<ArrayObject>(array, "getSize");
+    setStatus(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    return object == nullptr ? 0 : static_cast<CMPICount>(object->elements.size());
+}
+
+CMPIType getSimpleType(const CMPIArray* array, CMPIStatus* status) {
+    const ArrayObject* object = RequestObjects::get<ArrayObject>(array, "getSimpleType");
+    setStatus(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    return object == nullptr ? static_cast<CMPIType>(CMPI_null) : object->type;
+}
+
+CMPIData getElementAt(const CMPIArray* array, CMPICount index, CMPIStatus* status) {
+    const ArrayObject* object = RequestObjects::get<ArrayObject>(array, "getElementAt");
+    if (object == nullptr || index >= object->elements.size()) {
+        setStatus(status, CMPI_RC_ERR_NO_SUCH_PROPERTY);
+        return missing();
+    }
+    setStatus(status, CMPI_RC_OK);
+    cimom::Value element = nullOf(object->type);
+    element.content = object->elements[index];
+    return dataFrom(*object->repository, element, CMPI_goodValue);
+}
+
 // Object paths.
 
 /// A text of a path; an object manager may give null for one that is not set.
@@ -133,6 +164,23 @@ CMPIStatus addKey(const CMPIObjectPath* path, const char* name, const CMPIValue*
     return {CMPI_RC_OK, nullptr};
 }
 
+/// The names of the keys that the path's class declares and the path lacks, where the host
+/// counts them.
+std::vector<std::string> unsetKeys(const PathObject& path) {
+    std::vector<std::string> names;
+    const cimom::ClassDeclaration* declaration = RequestObjects::traits().declaredKeys
+                                                     ? path.repository->find(path.model.className)
+                                                     : nullptr;
+    if (declaration != nullptr) {
+        for (const cimom::PropertyDeclaration& property : declaration->properties) {
+            if (property.isKey() && path.model.key(property.name) == nullptr) {
+                names.push_back(property.name);
+            }
+        }
+    }
+    return names;
+}
+
 CMPIData getKey(const CMPIObjectPath* path, const char* name, CMPIStatus* status) {
     const PathObject* object = RequestObjects::get<PathObject>(path, "getKey");
     if (object == nullptr || !given(name, "getKey", "name")) {
@@ -140,6 +188,9 @@ CMPIData getKey(const CMPIObjectPath* path, const char* name, CMPIStatus* status
         return missing();
     }
     const cimom::Value* value = object->model.key(name);
+    if (value == nullptr && RequestObjects::traits().declaredKeys) {
+        violations().add(std::string("getKey reads out of bounds: the path has no ") + name);
+    }
     // So says SFCB of a missing key, and other object managers something else.
     setStatus(status, value == nullptr ? CMPI_RC_ERR_NOT_FOUND : CMPI_RC_OK);
     return value == nullptr ? missing() : dataFrom(*object->repository, *value, CMPI_keyValue);
@@ -148,22 +199,29 @@ CMPIData getKey(const CMPIObjectPath* path, const char* name, CMPIStatus* status
 CMPIData getKeyAt(const CMPIObjectPath* path, CMPICount index, CMPIString** name,
                   CMPIStatus* status) {
     const PathObject* object = RequestObjects::get<PathObject>(path, "getKeyAt");
-    if (object == nullptr || index >= object->model.keys.size()) {
+    const std::vector<std::string> unset =
+        object == nullptr ? std::vector<std::string>{} : unsetKeys(*object);
+    if (object == nullptr || index >= unset.size() + object->model.keys.size()) {
         setStatus(status, CMPI_RC_ERR_NO_SUCH_PROPERTY);
         return missing();
     }
     setStatus(status, CMPI_RC_OK);
-    const cimom::NamedValue& key = object->model.keys[index];
+    const bool isUnset = index < unset.size();
+    const cimom::NamedValue key =
+        isUnset ? cimom::NamedValue{unset[index], cimom::Value::null(cimom::Type::string, false)}
+                : object->model.keys[index - unset.size()];
     if (name != nullptr) {
         *name = RequestObjects::make<StringObject>(key.name);
     }
-    return dataFrom(*object->repository, key.value, CMPI_keyValue);
+    return dataFrom(*object->repository, key.value, isUnset ? CMPI_goodValue : CMPI_keyValue);
 }
 
 CMPICount getKeyCount(const CMPIObjectPath* path, CMPIStatus* status) {
     const PathObject* object = RequestObjects::get<PathObject>(path, "getKeyCount");
     setStatus(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
-    return object == nullptr ? 0 : static_cast<CMPICount>(object->model.keys.size());
+    return object == nullptr
+               ? 0
+               : static_cast<CMPICount>(unsetKeys(*object).size() + object->model.keys.size());
 }
 
 CMPIString* pathToString(const CMPIObjectPath* path, CMPIStatus* status) {
@@ -186,17 +244,40 @@ CMPIData getProperty(const CMPIInstance* instance, const char* name, CMPIStatus*
     return value == nullptr ? missing() : dataFrom(*object->repository, *value, CMPI_goodValue);
 }
 
+CMPIData getPropertyAt(const CMPIInstance* instance, CMPICount index, CMPIString** name,
+                       CMPIStatus* status) {
+    const InstanceObject* object = RequestObjects::get<InstanceObject>(instance, "getPropertyAt");
+    if (object == nullptr || index >= object->model.properties.size()) {
+        setStatus(status, CMPI_RC_ERR_NO_SUCH_PROPERTY);
+        return missing();
+    }
+    setStatus(status, CMPI_RC_OK);
+    const cimom::NamedValue& property = object->model.properties[index];
+    if (name != nullptr) {
+        *name = RequestObjects::make<StringObject>(property.name);
+    }
+    return dataFrom(*object->repository, property.value, CMPI_goodValue);
+}
+
+CMPICount getPropertyCount(const CMPIInstance* instance, CMPIStatus* status) {
+    const InstanceObject* object =
+        RequestObjects::get<InstanceObject>(instance, "getPropertyCount");
+    setStatus(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    return object == nullptr ? 0 : static_cast<CMPICount>(object->model.properties.size());
+}
+
 CMPIStatus setProperty(const CMPIInstance* instance, const char* name, const CMPIValue* value,
                        CMPIType type) {
     InstanceObject* object = RequestObjects::get<InstanceObject>(instance, "setProperty");
-    if (object == nullptr || !given(name, "setProperty", "name") ||
-        !given(value, "setProperty", "value")) {
+    if (object == nullptr || !given(name, "setProperty", "name")) {
         return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
     }
     if (!hasType(*object->repository, object->model.path.className, name, type, "setProperty")) {
         return {CMPI_RC_ERR_TYPE_MISMATCH, nullptr};
     }
-    put(object->model.properties, name, valueFrom(*value, type, "setProperty"));
+    // No value is the null of the type.
+    put(object->model.properties, name,
+        value == nullptr ? nullOf(type) : valueFrom(*value, type, "setProperty"));
     return {CMPI_RC_OK, nullptr};
 }
 
@@ -327,6 +408,9 @@ const CMPIStringFT StringObject::table = [] {
 
 const CMPIArrayFT ArrayObject::table = [] {
     auto table = emptyTable<CMPIArrayFT>();
+    table.getSize = &getSize;
+    table.getSimpleType = &getSimpleType;
+    table.getElementAt = &getElementAt;
     table.setElementAt = &setElementAt;
     return table;
 }();
@@ -346,6 +430,8 @@ const CMPIObjectPathFT PathObject::table = [] {
 const CMPIInstanceFT InstanceObject::table = [] {
     auto table = emptyTable<CMPIInstanceFT>();
     table.getProperty = &getProperty;
+    table.getPropertyAt = &getPropertyAt;
+    table.getPropertyCount = &getPropertyCount;
     table.setProperty = &setProperty;
     table.getObjectPath = &getObjectPath;
     return table;
@@ -384,8 +470,9 @@ PathObject::PathObject(const cimom::ClassRepository& classes, cimom::ObjectPath 
 InstanceObject::InstanceObject(const cimom::ClassRepository& classes, cimom::Instance content)
     : CMPIInstance{this, &table}, repository(&classes), model(std::move(content)) {}
 
-ArrayObject::ArrayObject(CMPICount size, CMPIType elementType)
-    : CMPIArray{this, &table}, type(elementType), elements(size) {}
+ArrayObject::ArrayObject(const cimom::ClassRepository& classes, CMPICount size,
+                         CMPIType elementType)
+    : CMPIArray{this, &table}, repository(&classes), type(elementType), elements(size) {}
 
 EnumerationObject::EnumerationObject(const cimom::ClassRepository& classes,
                                      std::vector<cimom::Instance> content)

@@ -12,6 +12,7 @@
 #include "cimom/ClassRepository.h"
 #include "cimom/Instance.h"
 #include "cimom/Status.h"
+#include "kit/StrictTraits.h"
 
 /// What a strict object manager hands to a provider: objects of its own, with tables
 /// that hold what each object manager fills and nothing else. Where a real one would
@@ -38,7 +39,7 @@ Violations& violations();
 /// them. Requests nest where a provider asks for the objects of another one.
 class RequestObjects {
   public:
-    RequestObjects();
+    explicit RequestObjects(const Traits& traits);
     ~RequestObjects();
     RequestObjects(const RequestObjects&) = delete;
     RequestObjects& operator=(const RequestObjects&) = delete;
@@ -69,12 +70,17 @@ class RequestObjects {
         return static_cast<Object*>(found);
     }
 
+    /// The traits of the host whose request this thread serves; those of a plain one when
+    /// it serves none.
+    static const Traits& traits();
+
   private:
     static void note(const char* function, const char* violation);
     static void keep(const void* record, std::shared_ptr<void> object);
     static void* find(const void* record);
 
     std::unordered_map<const void*, std::shared_ptr<void>> objects_;
+    Traits traits_;
     RequestObjects* outer_;
 };
 
@@ -104,7 +110,8 @@ struct InstanceObject : CMPIInstance {
 struct ArrayObject : CMPIArray {
     using Record = CMPIArray;
     static const CMPIArrayFT table;
-    ArrayObject(CMPICount size, CMPIType elementType);
+    ArrayObject(const cimom::ClassRepository& classes, CMPICount size, CMPIType elementType);
+    const cimom::ClassRepository* repository;
     CMPIType type;
     cimom::Array elements;
 };

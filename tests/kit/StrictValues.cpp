@@ -71,10 +71,13 @@ cimom::Scalar scalarFrom(const CMPIValue& value, CMPIType type, const char* func
     }
 }
 
+cimom::Value nullOf(CMPIType type) {
+    return cimom::Value::null(cimType(withoutArray(type)).value_or(cimom::Type::string),
+                              isArrayType(type));
+}
+
 cimom::Value valueFrom(const CMPIValue& value, CMPIType type, const char* function) {
-    cimom::Value result;
-    result.type = cimType(withoutArray(type)).value_or(cimom::Type::string);
-    result.isArray = isArrayType(type);
+    cimom::Value result = nullOf(type);
     if (result.isArray) {
         if (const auto* array = RequestObjects::get<ArrayObject>(value.array, function)) {
             result.content = array->elements;
@@ -91,7 +94,12 @@ CMPIData dataFrom(const cimom::ClassRepository& repository, const cimom::Value& 
     data.type = cmpiType(value.type, value.isArray);
     data.state = state;
     const cimom::Scalar* scalar = value.scalar();
-    if (scalar == nullptr || std::holds_alternative<std::monostate>(*scalar)) {
+    if (const cimom::Array* elements = value.array()) {
+        auto* array = RequestObjects::make<ArrayObject>(
+            repository, static_cast<CMPICount>(elements->size()), cmpiType(value.type));
+        array->elements = *elements;
+        data.value.array = array;
+    } else if (scalar == nullptr || std::holds_alternative<std::monostate>(*scalar)) {
         data.state = static_cast<CMPIValueState>(state | CMPI_nullValue);
     } else {
         data.value = toCmpi(repository, *scalar, value.type);
@@ -175,12 +183,33 @@ void checkDelivered(const cimom::ClassRepository& repository, const cimom::Insta
     }
 }
 
+namespace {
+
+const cimom::Value* defaultOf(const cimom::ClassRepository& repository,
+                              const cimom::ClassDeclaration& declaration, const std::string& name) {
+    const cimom::PropertyDeclaration* property = declaration.property(name);
+    if (property == nullptr) {
+        return nullptr;
+    }
+    if (!property->defaultValue.isNull()) {
+        return &property->defaultValue;
+    }
+    const cimom::ClassDeclaration* parent =
+        RequestObjects::traits().parentsDefaults && !declaration.superclass.empty()
+            ? repository.find(declaration.superclass)
+            : nullptr;
+    return parent == nullptr ? nullptr : defaultOf(repository, *parent, name);
+}
+
+}  // namespace
+
 cimom::Instance withDefaults(const cimom::ClassRepository& repository, cimom::Instance instance) {
     const cimom::ClassDeclaration* declaration = repository.find(instance.path.className);
     if (declaration != nullptr) {
         for (const cimom::PropertyDeclaration& property : declaration->properties) {
-            if (!property.defaultValue.isNull() && instance.property(property.name) == nullptr) {
-                instance.properties.push_back({property.name, property.defaultValue});
+            const cimom::Value* shown = defaultOf(repository, *declaration, property.name);
+            if (shown != nullptr && instance.property(property.name) == nullptr) {
+                instance.properties.push_back({property.name, *shown});
             }
         }
     }

@@ -16,6 +16,9 @@ namespace strict {
 cimom::Scalar scalarFrom(const CMPIValue& value, CMPIType type, const char* function);
 cimom::Value valueFrom(const CMPIValue& value, CMPIType type, const char* function);
 
+/// The null of a type of CMPI.
+cimom::Value nullOf(CMPIType type);
+
 /// What a provider gets; its texts and paths are objects of the present request.
 CMPIData dataFrom(const cimom::ClassRepository& repository, const cimom::Value& value,
                   CMPIValueState state);
@@ -33,7 +36,8 @@ bool hasType(const cimom::ClassRepository& repository, const std::string& classN
 void checkDelivered(const cimom::ClassRepository& repository, const cimom::ObjectPath& path);
 void checkDelivered(const cimom::ClassRepository& repository, const cimom::Instance& instance);
 
-/// The instance as a client sees it: an unset property shows its declared default.
+/// The instance as a client sees it: an unset property shows its declared default, in
+/// some hosts the nearest superclass' where the class declares null.
 cimom::Instance withDefaults(const cimom::ClassRepository& repository, cimom::Instance instance);
 
 }  // namespace strict

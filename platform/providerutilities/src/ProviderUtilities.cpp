@@ -54,6 +54,28 @@ bool readText(const CMPIData& data, std::string& value) {
     return false;
 }
 
+/// The key at a position with its name; false when it has no value. Some hosts count
+/// the keys that the class declares, and show those that the path lacks as null.
+bool readKeyAt(const CMPIObjectPath* path, CMPICount index, CMPIString*& name, CMPIData& data) {
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    name = nullptr;
+    data = path->ft->getKeyAt(path, index, &name, &status);
+    return isOk(status) && name != nullptr && holdsValue(data);
+}
+
+/// The key of a name, in any case. The path is never asked by name: the same hosts read
+/// out of bounds when it lacks the key.
+bool readKey(const CMPIObjectPath* path, std::string_view name, CMPIData& data) {
+    const CMPICount count = path->ft->getKeyCount(path, nullptr);
+    for (CMPICount i = 0; i < count; ++i) {
+        CMPIString* found = nullptr;
+        if (readKeyAt(path, i, found, data) && equalNames(textOf(found), name)) {
+            return true;
+        }
+    }
+    return false;
+}
+
 bool put(CMPIInstance* instance, const char* name, const CMPIValue& value, CMPIType type) {
     return instance != nullptr && name != nullptr &&
            isOk(instance->ft->setProperty(instance, name, &value, type));
@@ -176,7 +198,14 @@ CMPIInstance* ProviderUtilities::createInstance(const CMPIBroker* broker,
 }
 
 unsigned int ProviderUtilities::getKeyCount(const CMPIObjectPath* path) {
-    return path == nullptr ? 0 : path->ft->getKeyCount(path, nullptr);
+    const CMPICount declared = path == nullptr ? 0 : path->ft->getKeyCount(path, nullptr);
+    unsigned int count = 0;
+    for (CMPICount i = 0; i < declared; ++i) {
+        CMPIString* name = nullptr;
+        CMPIData data{};
+        count += readKeyAt(path, i, name, data) ? 1U : 0U;
+    }
+    return count;
 }
 
 bool ProviderUtilities::getKeyProperty(const CMPIObjectPath* path, const char* name,
@@ -184,9 +213,8 @@ bool ProviderUtilities::getKeyProperty(const CMPIObjectPath* path, const char* n
     if (path == nullptr || name == nullptr) {
         return false;
     }
-    CMPIStatus status{CMPI_RC_OK, nullptr};
-    const CMPIData data = path->ft->getKey(path, name, &status);
-    return isOk(status) && readText(data, value);
+    CMPIData data{};
+    return readKey(path, name, data) && readText(data, value);
 }
 
 bool ProviderUtilities::getKeyProperty(const CMPIObjectPath* path, const char* name,
@@ -194,9 +222,8 @@ bool ProviderUtilities::getKeyProperty(const CMPIObjectPath* path, const char* n
     if (path == nullptr || name == nullptr || reference == nullptr) {
         return false;
     }
-    CMPIStatus status{CMPI_RC_OK, nullptr};
-    const CMPIData data = path->ft->getKey(path, name, &status);
-    if (!isOk(status) || !holdsValue(data) || data.type != CMPI_ref || data.value.ref == nullptr) {
+    CMPIData data{};
+    if (!readKey(path, name, data) || data.type != CMPI_ref || data.value.ref == nullptr) {
         return false;
     }
     *reference = data.value.ref;
@@ -251,6 +278,11 @@ bool ProviderUtilities::setProperty(CMPIInstance* instance, const char* name,
     CMPIValue value{};
     value.ref = reference;
     return reference != nullptr && put(instance, name, value, CMPI_ref);
+}
+
+bool ProviderUtilities::setNull(CMPIInstance* instance, const char* name, CMPIType type) {
+    return instance != nullptr && name != nullptr &&
+           isOk(instance->ft->setProperty(instance, name, nullptr, type));
 }
 
 bool ProviderUtilities::setProperty(const CMPIBroker* broker, CMPIInstance* instance,
@@ -313,13 +345,12 @@ bool ProviderUtilities::transformObjectPathToMoniker(const CMPIObjectPath* path,
     if (path == nullptr) {
         return false;
     }
-    const unsigned int count = getKeyCount(path);
-    for (unsigned int i = 0; i < count; ++i) {
-        CMPIStatus status{CMPI_RC_OK, nullptr};
+    const CMPICount count = path->ft->getKeyCount(path, nullptr);
+    for (CMPICount i = 0; i < count; ++i) {
         CMPIString* name = nullptr;
-        const CMPIData data = path->ft->getKeyAt(path, i, &name, &status);
+        CMPIData data{};
         std::string value;
-        if (isOk(status) && name != nullptr && readText(data, value)) {
+        if (readKeyAt(path, i, name, data) && readText(data, value)) {
             moniker.addKey(schemaKeyName(textOf(name)), value);
         }
     }

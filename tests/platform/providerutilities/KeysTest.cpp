@@ -81,34 +81,48 @@ TEST_F(KeysTest, NameIsComparedWithoutRegardToCase) {
     EXPECT_EQ(value, "x");
 }
 
-TEST_F(KeysTest, CountIsThatOfAllKeys) {
+TEST_F(KeysTest, CountIsThatOfAllKeysWithAValue) {
     addTextKey(path_, "A", "x");
     addNumberKey(path_, "B", 7);
     addReferenceKey(path_, "C", newPath("TEST_Element"));
     EXPECT_EQ(ProviderUtilities::getKeyCount(path_), 3U);
 }
 
-/// What a host that is not ours may hand out for any key: see each test.
+/// What a host that is not ours may hand out for a key: see each test.
 CMPIData foreignKey{};
 CMPIrc foreignCode = CMPI_RC_OK;
+CMPIString* foreignNames[2] = {};
+
+/// A path of a class that declares two keys, of which the first is not set.
+CMPIData foreignKeyAt(const CMPIObjectPath* /*path*/, CMPICount index, CMPIString** name,
+                      CMPIStatus* rc) {
+    *name = foreignNames[index];
+    *rc = {index == 0 ? CMPI_RC_OK : foreignCode, nullptr};
+    CMPIData unset{};
+    unset.type = CMPI_chars;
+    unset.state = CMPI_nullValue;
+    return index == 0 ? unset : foreignKey;
+}
 
 class ForeignKeysTest : public KeysTest {
   protected:
     void SetUp() override {
         KeysTest::SetUp();
         functions_ = *path_->ft;
-        functions_.getKey = [](const CMPIObjectPath*, const char*, CMPIStatus* rc) {
-            *rc = {foreignCode, nullptr};
-            return foreignKey;
-        };
+        // Some hosts do not survive being asked by name.
+        functions_.getKey = nullptr;
+        functions_.getKeyCount = [](const CMPIObjectPath*, CMPIStatus*) -> CMPICount { return 2; };
+        functions_.getKeyAt = &foreignKeyAt;
+        foreignNames[0] = broker->eft->newString(broker, "Unset", nullptr);
+        foreignNames[1] = broker->eft->newString(broker, "Key", nullptr);
         foreignCode = CMPI_RC_OK;
         foreignKey = CMPIData{};
         foreignKey.state = CMPI_keyValue;
     }
 
-    bool readsText() const {
+    bool readsText(const char* name = "Key") const {
         std::string value = "before";
-        const bool read = ProviderUtilities::getKeyProperty(&foreign_, "Key", value);
+        const bool read = ProviderUtilities::getKeyProperty(&foreign_, name, value);
         EXPECT_EQ(value == "before", !read);
         return read && value == "text";
     }
@@ -164,6 +178,24 @@ TEST_F(ForeignKeysTest, ValuesThatComeWithAnErrorAreNotRead) {
     foreignKey.type = CMPI_ref;
     foreignKey.value.ref = path_;
     EXPECT_FALSE(readsReference());
+}
+
+TEST_F(ForeignKeysTest, KeysThatTheClassDeclaresAndThePathLacksAreNone) {
+    foreignKey.type = CMPI_chars;
+    foreignKey.value.chars = text_.data();
+    EXPECT_FALSE(readsText("Unset"));
+    EXPECT_TRUE(readsText("KEY"));
+    EXPECT_EQ(ProviderUtilities::getKeyCount(&foreign_), 1U);
+    foreignKey.state = CMPI_nullValue;
+    EXPECT_EQ(ProviderUtilities::getKeyCount(&foreign_), 0U);
+}
+
+TEST_F(ForeignKeysTest, KeysWithoutANameAreNone) {
+    foreignKey.type = CMPI_chars;
+    foreignKey.value.chars = text_.data();
+    foreignNames[1] = nullptr;
+    EXPECT_FALSE(readsText(""));
+    EXPECT_EQ(ProviderUtilities::getKeyCount(&foreign_), 0U);
 }
 
 TEST_F(KeysTest, TextNeedsABrokerWithWhichTheThreadHasMadeSomething) {

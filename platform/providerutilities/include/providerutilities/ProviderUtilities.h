@@ -42,8 +42,9 @@ struct ProviderUtilities {
     [[nodiscard]] static CMPIInstance* createInstance(const CMPIBroker* broker,
                                                       const CMPIObjectPath* path);
 
-    // Keys. A key is read as text only when it is one, as a reference only when
-    // it is one. A null reference adds no key.
+    // Keys. Only those with a value count, whatever the host counts, and a path is never
+    // asked for one by name. A key is read as text only when it is one, as a reference
+    // only when it is one. A null reference adds no key.
     [[nodiscard]] static unsigned int getKeyCount(const CMPIObjectPath* path);
     static bool getKeyProperty(const CMPIObjectPath* path, const char* name, std::string& value);
     static bool getKeyProperty(const CMPIObjectPath* path, const char* name,
@@ -58,6 +59,9 @@ struct ProviderUtilities {
     static bool setProperty(CMPIInstance* instance, const char* name, unsigned long long number);
     static bool setProperty(CMPIInstance* instance, const char* name, bool truth);
     static bool setProperty(CMPIInstance* instance, const char* name, CMPIObjectPath* reference);
+    /// Sets the null of a type: some object managers show the schema's default for a property
+    /// that stays unset.
+    static bool setNull(CMPIInstance* instance, const char* name, CMPIType type);
     /// A literal would silently become a boolean.
     static bool setProperty(CMPIInstance* instance, const char* name, const char* value) = delete;
     /// With dateTime, the text is a CIM date-time of 25 characters (DSP0004, 5.2.4);

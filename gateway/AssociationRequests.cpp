@@ -1,0 +1,116 @@
+#include "AssociationRequests.h"
+
+#include <algorithm>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "Links.h"
+#include "Lookup.h"
+#include "Refusal.h"
+#include "zrcommon/Strings.h"
+
+namespace ZR::DHCPClientGateway {
+
+namespace {
+
+bool isGiven(const char* name) {
+    return name != nullptr && *name != '\0';
+}
+
+bool accepts(const char* wanted, const char* role) {
+    return !isGiven(wanted) || equalNames(wanted, role);
+}
+
+/// The table knows the superclasses, so that a host need not be sure of them; a host may
+/// know of more, where its schema is larger.
+bool acceptsClass(const Request& request, const char* wanted, const ServedClass& served) {
+    if (!isGiven(wanted) || derivesFrom(served, wanted)) {
+        return true;
+    }
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    const CMPIBoolean derived = request.broker->eft->classPathIsA(
+        request.broker, makePath(request, served.name), wanted, &status);
+    return status.rc == CMPI_RC_OK && derived != 0;
+}
+
+/// An association in which the object can take part, and where.
+struct Part {
+    const Association* association;
+    std::size_t near;
+};
+
+std::vector<Part> partsOf(const Request& request, const ServedClass& source,
+                          const AssociationFilter& filter) {
+    std::vector<Part> parts;
+    for (const Association& association : allAssociations()) {
+        if (!acceptsClass(request, filter.association, *findClass(association.name))) {
+            continue;
+        }
+        for (std::size_t near = 0; near < association.ends.size(); ++near) {
+            if (takes(association.ends.at(near), source) &&
+                accepts(filter.role, association.ends.at(near).role) &&
+                accepts(filter.resultRole, association.ends.at(1 - near).role)) {
+                parts.push_back({&association, near});
+            }
+        }
+    }
+    return parts;
+}
+
+/// The classes at an end of which a client may want to see objects.
+bool mayGive(const Request& request, const End& end, const char* resultClass) {
+    return std::any_of(end.classes.begin(), end.classes.end(), [&](const char* name) {
+        return acceptsClass(request, resultClass, *findClass(name));
+    });
+}
+
+/// The source of the request; nothing when there is nothing to look for.
+std::optional<Object> sourceOf(const Request& request, const ServedClass* served,
+                               const std::vector<Part>& parts) {
+    return served == nullptr || parts.empty() ? std::nullopt
+                                              : std::optional(find(request, *served, Form::names));
+}
+
+}  // namespace
+
+void associators(const Request& request, const AssociationFilter& filter,
+                 const Delivery& delivery) {
+    const ServedClass* served = findClass(classNameOf(request.path));
+    std::vector<Part> parts;
+    if (served != nullptr) {
+        parts = partsOf(request, *served, filter);
+        std::erase_if(parts, [&](const Part& part) {
+            return !mayGive(request, part.association->ends.at(1 - part.near), filter.resultClass);
+        });
+    }
+    const std::optional<Object> source = sourceOf(request, served, parts);
+    for (const Part& part : parts) {
+        for (const Object& object :
+             linked(request, *part.association, 1 - part.near, source->keys, delivery.form())) {
+            const ServedClass* far = findClass(classNameOf(object.path));
+            // Another provider may give objects of a class of its own.
+            if (far == nullptr) {
+                far = findClass(part.association->ends.at(1 - part.near).classes.front());
+            }
+            if (acceptsClass(request, filter.resultClass, *far)) {
+                delivery.give(*far, object);
+            }
+        }
+    }
+}
+
+void references(const Request& request, const AssociationFilter& filter, const Delivery& delivery) {
+    const ServedClass* served = findClass(classNameOf(request.path));
+    const std::vector<Part> parts =
+        served == nullptr ? std::vector<Part>{} : partsOf(request, *served, filter);
+    const std::optional<Object> source = sourceOf(request, served, parts);
+    for (const Part& part : parts) {
+        for (const Link& link : linksOf(request, *part.association, part.near, *source)) {
+            delivery.give(*findClass(part.association->name),
+                          objectOf(request, link, delivery.form()));
+        }
+    }
+}
+
+}  // namespace ZR::DHCPClientGateway

@@ -1,0 +1,106 @@
+#include "Lookup.h"
+
+#include <algorithm>
+#include <string>
+
+#include "Refusal.h"
+#include "providerutilities/ProviderUtilities.h"
+
+namespace ZR::DHCPClientGateway {
+
+namespace {
+
+[[noreturn]] void refuseKey(const ServedClass& served, const char* key, const char* what) {
+    throw Refusal(CMPI_RC_ERR_INVALID_PARAMETER,
+                  std::string("The key ") + key + " of " + served.name + ' ' + what);
+}
+
+void requireKeys(const ServedClass& served, const Keys& keys) {
+    const bool references = served.server == Server::gateway;
+    for (const char* name : served.keys) {
+        const Key* key = keys.find(name);
+        if (key == nullptr) {
+            refuseKey(served, name, "is missing");
+        }
+        if (references ? key->reference == nullptr : !key->isText) {
+            refuseKey(served, name, references ? "is not a reference" : "is not a text");
+        }
+    }
+    if (keys.size() != served.keys.size()) {
+        throw Refusal(CMPI_RC_ERR_INVALID_PARAMETER,
+                      std::string("The path has a key that ") + served.name + " does not have");
+    }
+}
+
+[[noreturn]] void notFound(const ServedClass& served) {
+    throw Refusal(CMPI_RC_ERR_NOT_FOUND,
+                  std::string("There is no such instance of ") + served.name);
+}
+
+KeyTexts textsOf(const ServedClass& served, const Keys& keys) {
+    KeyTexts texts;
+    for (const char* name : served.keys) {
+        texts.emplace_back(name, keys.text(name));
+    }
+    return texts;
+}
+
+std::optional<Object> lookUp(const Request& request, const ServedClass& served, const Keys& keys,
+                             Form form) {
+    const KeyTexts texts = textsOf(served, keys);
+    if (served.server == Server::otherwise) {
+        return askOthersFor(request, served, texts);
+    }
+    std::vector<Object> objects = ask(request, served, form, texts);
+    const auto found = std::find_if(objects.begin(), objects.end(),
+                                    [&keys](const Object& object) { return object.keys == keys; });
+    if (found == objects.end()) {
+        return std::nullopt;
+    }
+    return std::move(*found);
+}
+
+}  // namespace
+
+const ServedClass& servedClassOf(const Request& request) {
+    const std::string name = classNameOf(request.path);
+    const ServedClass* served = findClass(name);
+    if (served == nullptr || served->server == Server::otherwise) {
+        throw Refusal(CMPI_RC_ERR_INVALID_CLASS, "This provider does not serve the class " + name);
+    }
+    return *served;
+}
+
+Object find(const Request& request, const ServedClass& served, Form form) {
+    const Keys keys(request.path);
+    requireKeys(served, keys);
+    std::optional<Object> found = lookUp(request, served, keys, form);
+    if (!found) {
+        notFound(served);
+    }
+    return *std::move(found);
+}
+
+Link findLink(const Request& request, const ServedClass& served) {
+    const Association& association = *findAssociation(served);
+    const Keys keys(request.path);
+    requireKeys(served, keys);
+    const std::size_t near = association.listed;
+    Request forEnd = request;
+    forEnd.path = keys.find(association.ends.at(near).role)->reference;
+    const CMPIObjectPath* farPath = keys.find(association.ends.at(1 - near).role)->reference;
+    const ServedClass* nearClass = findClass(classNameOf(forEnd.path));
+    if (nearClass == nullptr || !takes(association.ends.at(near), *nearClass)) {
+        notFound(served);
+    }
+    const Object object = find(forEnd, *nearClass, Form::names);
+    for (const Link& link : linksOf(request, association, near, object)) {
+        if (sameObject(link.paths.at(near), forEnd.path) &&
+            sameObject(link.paths.at(1 - near), farPath)) {
+            return link;
+        }
+    }
+    notFound(served);
+}
+
+}  // namespace ZR::DHCPClientGateway

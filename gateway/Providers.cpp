@@ -1,0 +1,124 @@
+#include "Providers.h"
+
+#include <atomic>
+
+#include "Collector.h"
+#include "Refusal.h"
+#include "providerutilities/ProviderUtilities.h"
+
+namespace ZR::DHCPClientGateway {
+
+namespace {
+
+std::atomic<CMPIInstanceMI*> exactProvider = nullptr;
+
+void requireSuccess(const CMPIStatus& status, const char* className) {
+    if (status.rc != CMPI_RC_OK) {
+        throw Refusal(status.rc, std::string("The provider of ") + className + " refuses");
+    }
+}
+
+const CMPIObjectPath* pathOf(const CMPIInstance* instance) {
+    return instance == nullptr ? nullptr : instance->ft->getObjectPath(instance, nullptr);
+}
+
+void keep(std::vector<Object>& objects, const CMPIObjectPath* path, const CMPIInstance* instance) {
+    if (path != nullptr) {
+        objects.push_back({path, instance, Keys(path)});
+    }
+}
+
+}  // namespace
+
+void useExactProvider(CMPIInstanceMI* provider) noexcept {
+    exactProvider = provider;
+}
+
+std::vector<Object> ask(const Request& request, const ServedClass& served, Form form,
+                        const KeyTexts& narrowing) {
+    Collector collector;
+    CMPIInstanceMI* provider = exactProvider;
+    const CMPIObjectPath* path =
+        makePath(request, served.name, served.narrows ? narrowing : KeyTexts{});
+    std::vector<Object> objects;
+    if (form == Form::names) {
+        requireSuccess(provider->ft->enumerateInstanceNames(provider, request.context,
+                                                            collector.record(), path),
+                       served.name);
+        objects.reserve(collector.paths().size());
+        for (const CMPIObjectPath* each : collector.paths()) {
+            keep(objects, each, nullptr);
+        }
+    } else {
+        requireSuccess(provider->ft->enumerateInstances(provider, request.context,
+                                                        collector.record(), path, nullptr),
+                       served.name);
+        objects.reserve(collector.instances().size());
+        for (const CMPIInstance* each : collector.instances()) {
+            keep(objects, pathOf(each), each);
+        }
+    }
+    return objects;
+}
+
+std::vector<Object> askOthers(const Request& request, const ServedClass& served) {
+    std::vector<Object> objects;
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    CMPIEnumeration* found = request.broker->bft->enumerateInstances(
+        request.broker, request.context, makePath(request, served.name), nullptr, &status);
+    // Without a provider of the class there are no associations with its objects.
+    while (status.rc == CMPI_RC_OK && found != nullptr && found->ft->hasNext(found, nullptr) != 0) {
+        const CMPIData next = found->ft->getNext(found, &status);
+        if (status.rc == CMPI_RC_OK) {
+            keep(objects, pathOf(next.value.inst), next.value.inst);
+        }
+    }
+    return objects;
+}
+
+std::optional<Object> askOthersFor(const Request& request, const ServedClass& served,
+                                   const KeyTexts& keys) {
+    const CMPIObjectPath* path = makePath(request, served.name, keys);
+    CMPIStatus status{CMPI_RC_OK, nullptr};
+    CMPIInstance* instance =
+        request.broker->bft->getInstance(request.broker, request.context, path, nullptr, &status);
+    const CMPIObjectPath* found = status.rc == CMPI_RC_OK ? pathOf(instance) : nullptr;
+    // Some object managers give what the provider delivers, whatever its keys.
+    if (found == nullptr || !(Keys(found) == Keys(path))) {
+        return std::nullopt;
+    }
+    return Object{found, instance, Keys(found)};
+}
+
+void modify(const Request& request, const CMPIObjectPath* path, const CMPIInstance* instance) {
+    Collector collector;
+    CMPIInstanceMI* provider = exactProvider;
+    requireSuccess(provider->ft->modifyInstance(provider, request.context, collector.record(), path,
+                                                instance, nullptr),
+                   classNameOf(path).c_str());
+}
+
+CMPIObjectPath* makePath(const Request& request, const char* className, const KeyTexts& keys) {
+    CMPIObjectPath* path =
+        ProviderUtilities::createObjectPath(request.broker, className, request.nameSpace);
+    bool complete = path != nullptr;
+    for (const auto& [name, value] : keys) {
+        complete = complete && ProviderUtilities::setKeyProperty(path, name, value);
+    }
+    if (!complete) {
+        throw Refusal(CMPI_RC_ERR_FAILED,
+                      std::string("The object manager makes no path of ") + className);
+    }
+    return path;
+}
+
+CMPIInstance* makeInstance(const Request& request, const CMPIObjectPath* path) {
+    CMPIInstance* instance = ProviderUtilities::createInstance(request.broker, path);
+    if (instance == nullptr) {
+        throw Refusal(CMPI_RC_ERR_FAILED,
+                      "The object manager makes no instance of " + classNameOf(path));
+    }
+    return instance;
+}
+
+}  // namespace ZR::DHCPClientGateway

@@ -1,0 +1,62 @@
+#pragma once
+
+#include <cmpift.h>
+
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "Classes.h"
+#include "Keys.h"
+
+namespace ZR::DHCPClientGateway {
+
+/// What a request is made with. All of it belongs to the object manager.
+struct Request {
+    const CMPIBroker* broker = nullptr;
+    const CMPIContext* context = nullptr;
+    const CMPIResult* result = nullptr;
+    const CMPIObjectPath* path = nullptr;  ///< what the client names
+    std::string nameSpace;                 ///< that of the path
+};
+
+/// The provider behind the gateway; null before its factory was called. Factories may run
+/// while requests do.
+void useExactProvider(CMPIInstanceMI* provider) noexcept;
+
+/// An object of a provider. It belongs to the object manager, and lives as long as the
+/// request.
+struct Object {
+    const CMPIObjectPath* path = nullptr;    ///< never null
+    const CMPIInstance* instance = nullptr;  ///< null where names are enough
+    Keys keys;
+};
+
+/// Whether requests want names or whole instances.
+enum class Form { names, instances };
+
+/// What the exact provider has of a class, in its order; with keys just what they name,
+/// where it narrows by keys. Throws Refusal when it refuses.
+[[nodiscard]] std::vector<Object> ask(const Request& request, const ServedClass& served, Form form,
+                                      const KeyTexts& narrowing = {});
+
+/// What other providers have of a class, with instances. Nothing where the object manager
+/// knows no provider for it, or the provider refuses.
+[[nodiscard]] std::vector<Object> askOthers(const Request& request, const ServedClass& served);
+
+/// The one object of another provider that has these keys, with its instance; none where it
+/// does not exist, or the object manager knows no provider.
+[[nodiscard]] std::optional<Object> askOthersFor(const Request& request, const ServedClass& served,
+                                                 const KeyTexts& keys);
+
+/// Writes a changed instance through the exact provider. Throws Refusal when it refuses.
+void modify(const Request& request, const CMPIObjectPath* path, const CMPIInstance* instance);
+
+/// A path in the request's namespace. Throws Refusal when the object manager makes none.
+[[nodiscard]] CMPIObjectPath* makePath(const Request& request, const char* className,
+                                       const KeyTexts& keys = {});
+
+/// An instance without properties. Throws Refusal when the object manager makes none.
+[[nodiscard]] CMPIInstance* makeInstance(const Request& request, const CMPIObjectPath* path);
+
+}  // namespace ZR::DHCPClientGateway

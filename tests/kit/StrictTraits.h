@@ -1,0 +1,41 @@
+#pragma once
+
+#include <array>
+
+namespace strict {
+
+/// What some object managers do and others do not: a provider must bear each.
+struct Traits {
+    /// A path counts the keys that its class declares. Those that are not set come first,
+    /// with the null state; asked for one of them by name, the path reads out of bounds.
+    bool declaredKeys = false;
+    /// `= NULL` in a MOF is no initialiser: a property that stays unset shows the default
+    /// that the nearest superclass declares.
+    bool parentsDefaults = false;
+    /// The response to GetInstance is the first instance that the provider hands over.
+    bool firstInstance = false;
+    /// The broker tells the version of the standard, where others tell 0.
+    bool tellsItsVersion = false;
+    /// Symbols are bound when they are used, not when a library is opened.
+    bool lateBinding = false;
+    /// Contexts have no entries.
+    bool emptyContexts = false;
+};
+
+struct NamedTraits {
+    const char* name;
+    Traits traits;
+};
+
+/// A host without any of them, and one with each.
+inline constexpr std::array namedTraits{
+    NamedTraits{"Plain", {}},
+    NamedTraits{"DeclaredKeys", {.declaredKeys = true}},
+    NamedTraits{"ParentsDefaults", {.parentsDefaults = true}},
+    NamedTraits{"FirstInstance", {.firstInstance = true}},
+    NamedTraits{"TellsItsVersion", {.tellsItsVersion = true}},
+    NamedTraits{"LateBinding", {.lateBinding = true}},
+    NamedTraits{"EmptyContexts", {.emptyContexts = true}},
+};
+
+}  // namespace strict
