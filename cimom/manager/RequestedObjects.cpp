@@ -11,14 +11,24 @@ namespace cimom {
 
 namespace {
 
-/// References that a provider made without a namespace are in that of the request.
-void completeReference(Value& value, const std::string& nameSpace) {
+/// References that a provider made without a namespace are in that of the request. Those
+/// with this host, made of what another provider gave, are like all others without a host.
+void completeReference(Value& value, const RequestSurroundings& surroundings) {
     const Scalar* const scalar = value.scalar();
     const auto* const reference =
         scalar == nullptr ? nullptr : std::get_if<std::shared_ptr<const ObjectPath>>(scalar);
-    if (reference != nullptr && (*reference)->nameSpace.empty()) {
+    if (reference == nullptr) {
+        return;
+    }
+    const bool here = !(*reference)->host.empty() && (*reference)->host == surroundings.host;
+    if (here || (*reference)->nameSpace.empty()) {
         ObjectPath full = **reference;
-        full.nameSpace = nameSpace;
+        if (here) {
+            full.host.clear();
+        }
+        if (full.nameSpace.empty()) {
+            full.nameSpace = surroundings.nameSpace;
+        }
         value.content = Scalar(std::make_shared<const ObjectPath>(std::move(full)));
     }
 }
@@ -33,13 +43,13 @@ void complete(ObjectPath& path, const RequestSurroundings& surroundings) {
         path.nameSpace = surroundings.nameSpace;
     }
     for (NamedValue& key : path.keys) {
-        completeReference(key.value, surroundings.nameSpace);
+        completeReference(key.value, surroundings);
     }
 }
 
 void complete(Instance& instance, const RequestSurroundings& surroundings) {
     for (NamedValue& property : instance.properties) {
-        completeReference(property.value, surroundings.nameSpace);
+        completeReference(property.value, surroundings);
     }
     complete(instance.path, surroundings);
 }

@@ -3,6 +3,7 @@
 #include <filesystem>
 #include <string>
 
+#include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"
 
 namespace test {
@@ -13,18 +14,16 @@ class FullSchema {
   public:
     FullSchema() {
         const std::filesystem::path source = ZR_SOURCE_DIR;
-        add(source / "schema/01-qualifiers.mof", "01-qualifiers.mof");
-        add(source / "tests/schema/cim-2.41.mof", "02-cim-2.41.mof");
-        add(source / "schema/10-dhcp-client.mof", "10-dhcp-client.mof");
+        const auto schema = source / "tests/schema/cim-2.41/cim_schema_2.41.0.mof";
+        ZR::Testing::writeFile(directory_ / "01-cim-2.41.mof",
+                               "#pragma include (\"" + schema.string() + "\")\n");
+        std::filesystem::copy(source / "schema/10-dhcp-client.mof",
+                              directory_ / "10-dhcp-client.mof");
     }
 
     [[nodiscard]] std::string path() const { return directory_.path().string(); }
 
   private:
-    void add(const std::filesystem::path& file, const char* name) const {
-        std::filesystem::copy(file, directory_ / name);
-    }
-
     ZR::Testing::TemporaryDirectory directory_;
 };
 

@@ -95,6 +95,16 @@ TEST_F(StrangerProvider, InstanceCanBeGotByEachNameThatAnOperationGave) {
     }
 }
 
+TEST_F(StrangerProvider, ReferencesToThisHostDoNotNameIt) {
+    const InstancesResult result = manager().references(l1);
+    ASSERT_FALSE(result.instances.empty());
+    for (const auto& instance : result.instances) {
+        EXPECT_EQ(instance->path.host, "testhost");
+        EXPECT_EQ(referenceOf(instance->path.key("Far")).host, "");
+        EXPECT_EQ(referenceOf(instance->property("Far")).host, "");
+    }
+}
+
 TEST_F(StrangerProvider, KeysOutliveAPropertyListThatTheProviderAppliesItself) {
     AssociationRequest request;
     request.propertyList = {"Note"};

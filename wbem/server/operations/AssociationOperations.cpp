@@ -48,6 +48,9 @@ ResponseBody classAssociationsResponse(Request& request, const AssociationParame
     const ClassDeclaration& source =
         requireClass(request, wanted.object.path.className, CimStatus::invalidClass);
     const ClassRepository& repository = request.manager.repository();
+    if (const Status status = checkClasses(wanted.filter, repository); !status.ok()) {
+        throw CimError(CimStatus::invalidParameter, status.message);
+    }
     auto classes = kind == Kind::associators
                        ? associatedClasses(source, wanted.filter, repository)
                        : associationClasses(source, wanted.filter, repository);

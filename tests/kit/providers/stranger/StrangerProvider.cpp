@@ -56,7 +56,9 @@ CMPIInstance* link(const Tie& tie, const char** properties) {
     CMPIValue value{};
     value.ref = pathOf(thing("Stranger_Left", tie.near));
     instance->ft->setProperty(instance, "Near", &value, CMPI_ref);
+    // With the host of the tests' object manager, as a path has that another provider gave.
     value.ref = pathOf(thing("Stranger_Right", tie.far));
+    value.ref->ft->setHostname(value.ref, "testhost");
     instance->ft->setProperty(instance, "Far", &value, CMPI_ref);
     setText(instance, "Note", "a link");
     return instance;

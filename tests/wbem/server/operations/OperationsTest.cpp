@@ -206,6 +206,22 @@ TEST_F(WbemOperations, AssociationsKeepToEveryFilter) {
     EXPECT_THAT(propertiesOf(wbem::readInstance(listed[0].children.at(1))), ElementsAre("Id"));
 }
 
+TEST_F(WbemOperations, UnknownClassOfAFilterIsAnInvalidParameter) {
+    const std::string refused = "4 no class \"Nope\", by which the associations are to be chosen";
+    for (const std::string& object :
+         {instanceName("Test_Left", "l1"), std::string("<CLASSNAME NAME=\"Test_Left\"/>")}) {
+        const std::string source = parameter("ObjectName", object);
+        const std::string result = source + classParameter("Nope", "ResultClass");
+        for (const char* const operation :
+             {"Associators", "AssociatorNames", "References", "ReferenceNames"}) {
+            EXPECT_EQ(failure(operation, result), refused) << operation << object;
+        }
+        const std::string association = source + classParameter("Nope", "AssocClass");
+        EXPECT_EQ(failure("Associators", association), refused) << object;
+        EXPECT_EQ(failure("AssociatorNames", association), refused) << object;
+    }
+}
+
 TEST_F(WbemOperations, HostAndNamespaceStandInTheResultsOfAssociations) {
     const auto found = returned(
         server.call("AssociatorNames", parameter("ObjectName", instanceName("Test_Left", "l2"))));
