@@ -99,7 +99,7 @@ InterfaceState stateOf(const LeaseOverview& lease, const InterfaceOverview& inte
         return own;
     }
     // Where no client runs, none asks.
-    if (lease.clientGone) {
+    if (lease.clientRuns == false) {
         return InterfaceState::bound;
     }
     return hasPassed(lease.rebinds, now)  ? InterfaceState::rebinding

@@ -96,18 +96,10 @@ LeaseOverview leaseOf(const ZR::Snapshot& snapshot, ZR::Snapshot::Index node) {
     lease.client = textOf(snapshot, node, Properties::Client);
     lease.process = numberOf(snapshot, node, Properties::Process);
     lease.source = textOf(snapshot, node, Properties::Source);
+    if (const auto* const runs = read<bool>(snapshot, node, Properties::ClientRuns)) {
+        lease.clientRuns = *runs;
+    }
     return lease;
-}
-
-/// Whether a diagnostic says that the client of the interface's lease does not run.
-bool isClientGone(const ZR::Snapshot& snapshot, const std::string& interface,
-                  const LeaseOverview& lease) {
-    const auto diagnostics = snapshot.diagnostics();
-    return std::any_of(diagnostics.begin(), diagnostics.end(), [&](const ZR::Diagnostic& each) {
-        return each.kind == ZR::Diagnostic::Kind::ClientGone && !lease.address.empty() &&
-               each.text.starts_with(interface + ": ") &&
-               each.text.find(' ' + lease.address + ' ') != std::string::npos;
-    });
 }
 
 }  // namespace
@@ -146,9 +138,7 @@ std::vector<InterfaceOverview> interfacesOf(const ZR::Snapshot& snapshot) {
         const auto place = places.find(snapshot.node(node).parent);
         if (place != places.end()) {
             InterfaceOverview& interface = interfaces[place->second];
-            LeaseOverview lease = leaseOf(snapshot, node);
-            lease.clientGone = isClientGone(snapshot, interface.name, lease);
-            interface.leases->push_back(std::move(lease));
+            interface.leases->push_back(leaseOf(snapshot, node));
         }
     }
     return interfaces;

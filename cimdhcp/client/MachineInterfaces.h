@@ -44,7 +44,7 @@ struct LeaseOverview {
     std::string client;
     std::optional<std::uint64_t> process;
     std::string source;
-    bool clientGone = false;  ///< a diagnostic says that its client does not run
+    std::optional<bool> clientRuns;
 
     bool operator==(const LeaseOverview&) const = default;
 };

@@ -82,6 +82,7 @@ class LeaseNode {
             add(Properties::OptionsReceived, NumberList{{codes.begin(), codes.end()}});
         }
     }
+    void clientRuns(bool value) { add(Properties::ClientRuns, value); }
     void process(std::int32_t pid) {
         if (pid > 0) {
             add(Properties::Process, number(pid));
@@ -127,6 +128,10 @@ void addLease(const Lease& claim, const DecidedInterface& interface, Explain exp
     node.text(Properties::Client, nameOf(lease.client));
     node.process(pid);
     node.text(Properties::Source, lease.origin);
+    // Of a client that is not seen it is not known.
+    if (lease.clientAlive || !interface.view.hidden) {
+        node.clientRuns(lease.clientAlive);
+    }
 }
 
 /// The address that the interface shows, if DHCP gave it.

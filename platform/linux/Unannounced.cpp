@@ -27,13 +27,6 @@ std::string readLastProcess(const Roots& roots) {
     return std::string{text.substr(blank == std::string_view::npos ? 0 : blank + 1)};
 }
 
-/// Also those beside which none is bound to the clients' port, as while a client asks for
-/// its first address.
-std::vector<PacketSocket> readPackets(const Roots& roots) {
-    std::vector<Diagnostic> ignored;
-    return readPacketSockets(roots, ignored);
-}
-
 void takeProcesses(const ClientFacts& from, ClientFacts& to) {
     to.processes = from.processes;
     to.managers = from.managers;
@@ -50,7 +43,8 @@ bool sameProcesses(const ClientFacts& a, const ClientFacts& b) {
 
 void Unannounced::begin() {
     lastProcess_ = readLastProcess(roots_);
-    packetSockets_ = readPackets(roots_);
+    std::vector<Diagnostic> ignored;  // the reader of the sockets tells them
+    packetSockets_ = readPacketSockets(roots_, ignored);
     settled_ = false;
 }
 
@@ -78,7 +72,9 @@ bool Unannounced::changed() {
     ClientFacts seen;
     takeProcesses(sockets_, seen);
     readClientSockets(roots_, seen);
-    return seen.sockets != sockets_.sockets || readPackets(roots_) != packetSockets_;
+    // Also those beside which none is bound to the clients' port, as while a client asks for
+    // its first address.
+    return seen.sockets != sockets_.sockets || seen.sockets.packets != packetSockets_;
 }
 
 }  // namespace ZR::Live

@@ -157,8 +157,9 @@ ClientSockets readSockets(const Roots& roots, std::vector<Diagnostic>& diagnosti
     const auto udp = readOptionalFile(ownNetwork(roots, "udp"), diagnostics);
     sockets.bound = parseUdpSockets(udp.value_or(""));
     removeUntrusted(roots, users, sockets.bound, diagnostics);
+    sockets.packets = readPacketSockets(roots, diagnostics);
     if (!sockets.bound.empty()) {
-        for (const PacketSocket& socket : readPacketSockets(roots, diagnostics)) {
+        for (const PacketSocket& socket : sockets.packets) {
             auto& links = sockets.packetLinks;
             if (std::find(links.begin(), links.end(), socket.link) == links.end()) {
                 links.push_back(socket.link);

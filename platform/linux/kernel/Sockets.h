@@ -24,14 +24,6 @@ struct PortSocket {
     bool operator==(const PortSocket&) const = default;
 };
 
-/// The sockets that may be those of a DHCP client.
-struct ClientSockets {
-    std::vector<PortSocket> bound;           ///< on the port of DHCP clients
-    std::vector<std::uint32_t> packetLinks;  ///< links where a packet socket hears IPv4
-
-    bool operator==(const ClientSockets&) const = default;
-};
-
 /// The sockets on UDP port 68 in a text of the form of /proc/net/udp. Lines that are not
 /// of that form are skipped.
 [[nodiscard]] std::vector<PortSocket> parseUdpSockets(std::string_view text);
@@ -45,6 +37,16 @@ struct PacketSocket {
     bool operator==(const PacketSocket&) const = default;
 };
 
+/// The sockets that may be those of a DHCP client.
+struct ClientSockets {
+    std::vector<PortSocket> bound;           ///< on the port of DHCP clients
+    std::vector<std::uint32_t> packetLinks;  ///< links that one of `packets` hears; none
+                                             ///< without a bound one
+    std::vector<PacketSocket> packets;       ///< all, whoever has them
+
+    bool operator==(const ClientSockets&) const = default;
+};
+
 /// Those in a text of the form of /proc/net/packet. Lines that are not of that form are
 /// skipped.
 [[nodiscard]] std::vector<PacketSocket> parsePacketSockets(std::string_view text);
@@ -54,8 +56,7 @@ struct PacketSocket {
                                                           std::vector<Diagnostic>& diagnostics);
 
 /// The sockets of this network namespace. Any user may read them, also where the
-/// processes that have them are hidden. Packet sockets are looked at only where there is
-/// a bound one.
+/// processes that have them are hidden. Each table is read once.
 ///
 /// Where every user may bind the port (net.ipv4.ip_unprivileged_port_start, ip(7)), only the
 /// sockets of root and of `users`, those of the running clients and managers, are believed.

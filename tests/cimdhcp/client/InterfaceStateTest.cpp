@@ -68,7 +68,7 @@ TEST(InterfaceState, FollowsTheTimesOfTheLease) {
 
 TEST(InterfaceState, NoClientRenewsWhereNoneRuns) {
     LeaseOverview left = lease();
-    left.clientGone = true;
+    left.clientRuns = false;
     EXPECT_EQ(wordFor(interface({left}), now + 2000), "bound");
     EXPECT_EQ(wordFor(interface({left}), now + 3200), "bound");
     EXPECT_EQ(wordFor(interface({left}), now + 3600), "expired");

@@ -177,23 +177,16 @@ TEST_F(LeasesOfATree, HaveNoTimesBeyondTheLast) {
     EXPECT_EQ(leases()[0].expires, static_cast<std::int64_t>(ZR::NodeLexicon::never));
 }
 
-TEST_F(LeasesOfATree, KnowThatTheirClientIsGone) {
-    using ZR::Diagnostic;
+TEST_F(LeasesOfATree, KnowWhetherTheirClientRuns) {
     addLease();
-    builder_.property(Properties::Address, std::string("192.0.2.1"));
+    builder_.property(Properties::ClientRuns, true);
     addLease();
-    builder_.property(Properties::Address, std::string("192.0.2.17"));
+    builder_.property(Properties::ClientRuns, false);
     addLease();
-    builder_.diagnostic(
-        Diagnostic("eth1: the client that leased 192.0.2.17 (dhclient) does not run",
-                   Diagnostic::Kind::ClientGone));
-    builder_.diagnostic(Diagnostic("eth0: the client that leased 192.0.2.1 (dhclient) does not run",
-                                   Diagnostic::Kind::ClientGone));
-    builder_.diagnostic(Diagnostic("eth1: 192.0.2.1 is noteworthy", Diagnostic::Kind::Note));
     const auto found = leases();
-    EXPECT_FALSE(found[0].clientGone);
-    EXPECT_TRUE(found[1].clientGone);
-    EXPECT_FALSE(found[2].clientGone);
+    EXPECT_EQ(found[0].clientRuns, true);
+    EXPECT_EQ(found[1].clientRuns, false);
+    EXPECT_EQ(found[2].clientRuns, std::nullopt);
 }
 
 class MachineInterfacesServed : public ::testing::Test {

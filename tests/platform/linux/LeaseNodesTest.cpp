@@ -131,7 +131,8 @@ TEST_F(LeaseNodesTest, ALeaseTellsAllThatItsFileSays) {
                              property(Properties::ClientIdentifier, "1:52:54:0:ab:cd:ef"),
                              property(Properties::Client, "dhclient"),
                              property(Properties::Process, number(17)),
-                             property(Properties::Source, "/var/lib/dhcp/dhclient.leases"))));
+                             property(Properties::Source, "/var/lib/dhcp/dhclient.leases"),
+                             property(Properties::ClientRuns, true))));
     const auto node = tree_->first(NodeType::DHCPLease);
     EXPECT_EQ(tree_->origin(node, Properties::Address),
               "dhclient, process 17 /var/lib/dhcp/dhclient.leases: a live lease");
@@ -145,7 +146,17 @@ TEST_F(LeaseNodesTest, WhatIsNotKnownIsLeftOut) {
                     SnapshotProperty{Properties::ClientState, false, state(ClientState::Bound)},
                     SnapshotProperty{Properties::Address, false, "192.0.2.7"},
                     SnapshotProperty{Properties::LeaseExpires, false, time(now + 600)},
-                    SnapshotProperty{Properties::Client, false, "dhclient"})));
+                    SnapshotProperty{Properties::Client, false, "dhclient"},
+                    SnapshotProperty{Properties::ClientRuns, false, true})));
+}
+
+TEST_F(LeaseNodesTest, OfAClientThatIsNotSeenItIsNotKnownWhetherItRuns) {
+    lease().clientAlive = false;
+    EXPECT_EQ(value(Properties::ClientRuns), PropertyValue{false});
+    facts_.clients.processesHidden = true;
+    EXPECT_EQ(value(Properties::ClientRuns), PropertyValue{});
+    facts_.clients.leases[0].clientAlive = true;
+    EXPECT_EQ(value(Properties::ClientRuns), PropertyValue{true});
 }
 
 TEST_F(LeaseNodesTest, ALeaseThatIsRebindingSaysSo) {

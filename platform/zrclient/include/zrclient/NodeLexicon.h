@@ -40,6 +40,7 @@ enum class Properties : unsigned short {
     Client = 1010,            ///< string: the program, "dhclient" or "systemd-networkd"
     Process = 1011,           ///< unsigned int: number of the client's process
     Source = 1012,            ///< string: the file or bus that tells it
+    ClientRuns = 1013,        ///< bool: the client that holds the lease runs now
 };
 
 /// Values of Properties::ClientState: the value map of CIM_DHCPProtocolEndpoint (CIM 2.41),
@@ -93,7 +94,7 @@ inline constexpr std::array<Entry<NodeType>, 3> nodeTypes{{
     {NodeType::DHCPLease, "DHCPLease"},
 }};
 
-inline constexpr std::array<Entry<Properties>, 20> properties{{
+inline constexpr std::array<Entry<Properties>, 21> properties{{
     {Properties::AddressSource, "AddressSource"},
     {Properties::IPv4Address, "IPv4Address"},
     {Properties::DHCPServerAddresses, "DHCPServerAddresses"},
@@ -114,6 +115,7 @@ inline constexpr std::array<Entry<Properties>, 20> properties{{
     {Properties::Client, "Client"},
     {Properties::Process, "Process"},
     {Properties::Source, "Source"},
+    {Properties::ClientRuns, "ClientRuns"},
 }};
 
 /// The name of a number; empty for a number that the lexicon does not have.

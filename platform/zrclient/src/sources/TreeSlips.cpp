@@ -22,6 +22,7 @@ enum class Wanted : std::uint8_t { truth, number, time, text, texts, numbers, an
 Wanted wantedOf(Properties id) {
     switch (id) {
         case Properties::DHCPEnabled:
+        case Properties::ClientRuns:
             return Wanted::truth;
         case Properties::AddressSource:
         case Properties::NameMaxLength:

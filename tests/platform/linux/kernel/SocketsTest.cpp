@@ -60,6 +60,10 @@ TEST(Sockets, EachLinkOnceAndOnlyBesideABoundSocket) {
     EXPECT_THAT(readSockets(roots, diagnostics).packetLinks, IsEmpty());
     root.write("/proc/thread-self/net/udp", "1: 00000000:0044 00000000:0000 07 0:0 0:0 0 0\n");
     EXPECT_THAT(readSockets(roots, diagnostics).packetLinks, ElementsAre(2, 3));
+    EXPECT_THAT(
+        readSockets(roots, diagnostics).packets,
+        ElementsAre(PacketSocket{.link = 2, .inode = 1}, PacketSocket{.link = 3, .inode = 2},
+                    PacketSocket{.link = 2, .inode = 3}));
     EXPECT_THAT(ZR::Testing::textsOf(diagnostics), IsEmpty());
 }
 
