@@ -80,7 +80,8 @@ class RegistrationReader {
         std::string location;
         if (!(words >> className >> nameSpace >> provider >> location) || !(words >> std::ws) ||
             words.eof() || !isName(className)) {
-            fail(line_, "\"" + std::string(text) +
+            // Not with operator+, in which g++ 12 sees a copy that is too long.
+            fail(line_, std::string("\"").append(text) +
                             "\" is neither [CLASS] nor a line of the form "
                             "CLASS NAMESPACE PROVIDER LOCATION TYPE...");
         }
