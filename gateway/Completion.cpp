@@ -38,7 +38,8 @@ const CMPIInstance* listed(const Request& request, const ServedClass& served, co
         }
     }
     for (const Property& property : served.properties) {
-        if (!lists(properties, property.name)) {
+        // Some object managers fail on an instance that lacks a reference of its path.
+        if (property.type != CMPI_ref && !lists(properties, property.name)) {
             continue;
         }
         if (property.presence != Presence::never && hasValue(object.instance, property.name)) {

@@ -60,13 +60,15 @@ before or behind the command.)";
 
 constexpr const char* checkHelp =
     R"(Each line begins with "ok", with "note" (worth a look) or with "BAD" (wrong); an arrow below
-it shows the remedy.
+it shows the remedy. With --connect or --hosts, what servers respond is checked: that each
+class is served, that an instance is the one that was asked for, and that associations
+lead somewhere.
 
 Exit status:
   0  nothing is wrong, though there may be notes
   1  something is wrong
   2  the command line cannot be understood
-  3  the output cannot be written)";
+  3  the output cannot be written, or the server cannot be reached or understood)";
 
 std::string showHelp() {
     constexpr std::size_t wordWidth = 11;
@@ -255,7 +257,7 @@ class CommandLineReader::Parser {
             ->envname("CIMDHCP_CIM_SCHEMA")
             ->group(advancedGroup);
         app_.add_flag("--exact", line_.options.exact,
-                      "The exact provider, without the gateway in front of it")
+                      "The exact provider, not the gateway before it")
             ->group(advancedGroup);
     }
 

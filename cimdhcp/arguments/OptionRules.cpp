@@ -42,7 +42,8 @@ void checkServers(const CommandLine& line) {
         }
         return;
     }
-    if (!asksClient(line.command)) {
+    // The check examines a server otherwise than this machine.
+    if (!asksClient(line.command) && !isOneOf<CheckCommand>(line.command)) {
         refuse(
             "this command is about this machine alone; --connect and --hosts are "
             "not for it");

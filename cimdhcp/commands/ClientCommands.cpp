@@ -9,12 +9,14 @@
 #include "commands/CimOperations.h"
 #include "commands/ClassTable.h"
 #include "commands/DiagnosticText.h"
+#include "commands/Findings.h"
 #include "commands/Graph.h"
 #include "commands/GraphDrawing.h"
 #include "commands/Overview.h"
 #include "commands/Rename.h"
 #include "commands/ResponseOrder.h"
 #include "commands/ResponseText.h"
+#include "commands/ServerFindings.h"
 #include "text/JsonText.h"
 
 namespace cimdhcp {
@@ -64,9 +66,19 @@ class Execution {
         return {command.svg ? drawSvg(text) : text, "", std::nullopt};
     }
 
+    Outcome operator()(const CheckCommand& /*command*/) const {
+        const std::vector<Finding> findings = serverFindings(client_);
+        Outcome outcome{presentation_.json() ? findingsJson(findings) : findingsText(findings), "",
+                        std::nullopt};
+        if (!isGood(findings)) {
+            outcome.failure = somethingIsWrong();
+        }
+        return outcome;
+    }
+
     template <typename Kind>
     Outcome operator()(const Kind& command) const {
-        if constexpr (isOneOf<Kind, TreeCommand, ServeCommand, UserAddCommand, CheckCommand>) {
+        if constexpr (isOneOf<Kind, TreeCommand, ServeCommand, UserAddCommand>) {
             throw Failure(ExitStatus::usage, "this command is about this machine alone");
         } else {
             CimOperation operation = cimdhcp::carryOut(command, client_);

@@ -80,4 +80,8 @@ bool isGood(const std::vector<Finding>& findings) noexcept {
                         [](const Finding& each) { return each.verdict == Verdict::bad; });
 }
 
+Failure somethingIsWrong() {
+    return Failure(ExitStatus::notDone, "something is wrong; see the list");
+}
+
 }  // namespace cimdhcp

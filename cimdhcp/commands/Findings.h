@@ -4,6 +4,8 @@
 #include <string>
 #include <vector>
 
+#include "text/Failure.h"
+
 namespace cimdhcp {
 
 /// One thing that was looked at, for an administrator.
@@ -29,5 +31,7 @@ struct Finding {
 
 /// Whether nothing bad was found.
 [[nodiscard]] bool isGood(const std::vector<Finding>& findings) noexcept;
+/// How a program ends that has printed findings which are not good.
+[[nodiscard]] Failure somethingIsWrong();
 
 }  // namespace cimdhcp

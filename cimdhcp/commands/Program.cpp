@@ -75,7 +75,7 @@ class Execution {
             check(line_.options, installations(executableFile()), presentation_.now);
         outputs_.out << (presentation_.json() ? findingsJson(findings) : findingsText(findings));
         if (!isGood(findings)) {
-            throw Failure(ExitStatus::notDone, "something is wrong; see the list");
+            throw somethingIsWrong();
         }
     }
 

@@ -26,7 +26,8 @@ cp "$tree" "$directory/tree.json"
 # What is in the way on a machine where the packages are installed.
 cat >"$directory/clear" <<'TEXT'
 set -euo pipefail
-dpkg --purge cimdhcp cmpi-dhcp-client-neighbours cmpi-dhcp-client-provider dhcp-client-provider-schema
+dpkg --purge cimdhcp cmpi-dhcp-client cmpi-dhcp-client-neighbours cmpi-dhcp-client-provider \
+    dhcp-client-provider-schema
 rm -rf /etc/zr /var/lib/dhcp-client-provider
 TEXT
 cat >"$directory/inside" <<'TEXT'
@@ -47,14 +48,32 @@ cimdhcp --tree /tree.json show
 cimdhcp --tree /tree.json rename eth0 new
 grep -x CONFIG_NAME=new /var/lib/dhcp-client-provider/ifcfg-eth0
 cimdhcp --tree /tree.json classes | tail -n +2 | wc -l
+cimdhcp --exact --tree /tree.json classes | tail -n +2 | wc -l
 DESTDIR=/stage /usr/share/dhcp-client-provider/provider-register.sh -t sfcb -v | grep -c written
 DESTDIR=/stage /usr/share/dhcp-client-provider/provider-register.sh -t sfcb -d
 echo "== a setting that was changed survives a new installation"
 echo LOG_LEVEL=4000 >/etc/zr/platform.conf
-dpkg --install --force-confdef cmpi-dhcp-client-provider_*.deb >/dev/null
+dpkg --install --force-confdef dhcp-client-provider-schema_*.deb >/dev/null
 cat /etc/zr/platform.conf
+echo "== a library that is removed is taken out of the object manager"
+# In the place of one that was built from source; dpkg's PATH may be without it.
+mkdir -p /usr/local/bin /usr/local/var/lib/sfcb/stage
+printf '#!/bin/sh\necho "sfcbrepos $*"\n' >/usr/local/bin/sfcbrepos
+chmod +x /usr/local/bin/sfcbrepos
+registered() { (cd /usr/local/var/lib/sfcb/stage && find . -type f | LC_ALL=C sort); }
+/usr/share/dhcp-client-provider/provider-register.sh --exact
+registered
+# The other packages' registration stays.
+PATH=/usr/sbin:/usr/bin:/sbin:/bin dpkg --remove cmpi-dhcp-client-neighbours | grep sfcbrepos
+registered
+/usr/share/dhcp-client-provider/provider-register.sh
+registered
+PATH=/usr/sbin:/usr/bin:/sbin:/bin dpkg --remove cimdhcp cmpi-dhcp-client | grep sfcbrepos
+registered
+rm -r /usr/local/bin/sfcbrepos /usr/local/var/lib/sfcb
+rmdir -p --ignore-fail-on-non-empty /usr/local/var/lib
 echo "== purge"
-dpkg --purge cimdhcp cmpi-dhcp-client-neighbours cmpi-dhcp-client-provider \
+dpkg --purge cimdhcp cmpi-dhcp-client cmpi-dhcp-client-neighbours cmpi-dhcp-client-provider \
     dhcp-client-provider-schema >/dev/null
 TEXT
 
@@ -104,9 +123,22 @@ eth1       off   off    -               203.0.113.4    -           -            
 eth0: the configuration name is now "new", was "old" (/var/lib/dhcp-client-provider/ifcfg-eth0).
 CONFIG_NAME=new
 15
-3
+15
+2
 == a setting that was changed survives a new installation
 LOG_LEVEL=4000
+== a library that is removed is taken out of the object manager
+sfcbrepos -f
+./mofs/root/cimv2/10-dhcp-client.mof
+./regs/DHCPClientNeighbours.reg
+./regs/DHCPClientProvider.reg
+sfcbrepos -f
+./mofs/root/cimv2/10-dhcp-client.mof
+./regs/DHCPClientProvider.reg
+sfcbrepos -f
+./mofs/root/cimv2/10-dhcp-client.mof
+./regs/DHCPClient.reg
+sfcbrepos -f
 == purge
 == left behind
 TEXT

@@ -56,15 +56,14 @@ TEST(OptionRules, SaysHowTheResultIsShown) {
 }
 
 TEST(OptionRules, RefusesWhatServersCannotBeAsked) {
-    for (const std::vector<std::string>& command : {std::vector<std::string>{"tree"},
-                                                    {"serve"},
-                                                    {"check"},
-                                                    {"user", "add", "--users", "f", "a"}}) {
+    for (const std::vector<std::string>& command :
+         {std::vector<std::string>{"tree"}, {"serve"}, {"user", "add", "--users", "f", "a"}}) {
         std::vector<std::string> arguments{"--connect", "h"};
         arguments.insert(arguments.end(), command.begin(), command.end());
         EXPECT_EQ(refusal(arguments),
                   "this command is about this machine alone; --connect and --hosts are not for it");
     }
+    EXPECT_EQ(line({"--connect", "h", "check"}).command, Command(CheckCommand{}));
     EXPECT_EQ(refusal({"--connect", "h", "rename", "--create", "eth0", "x"}),
               "--create cannot make files on other machines");
     EXPECT_EQ(refusal({"--hosts", "f", "--tree", "t", "show"}),
