@@ -2,7 +2,6 @@
 
 #include <gtest/gtest.h>
 
-#include <optional>
 #include <stdexcept>
 #include <utility>
 
@@ -10,7 +9,6 @@
 #include "cimom/Results.h"
 #include "cimxml/OperationRequest.h"
 #include "cimxml/OperationResponse.h"
-#include "kit/FullSchema.h"
 #include "kit/StrictHost.h"
 #include "kit/WireSupport.h"
 
@@ -32,13 +30,8 @@ const char* charactersOf(const Name& name) {
 
 class StrictManager : public Host {
   public:
-    StrictManager(const strict::Traits& traits, bool wholeSchema) {
-        std::string directory = schema;
-        if (wholeSchema) {
-            directory = full_.emplace().path();
-        }
-        host_.emplace(directory, std::vector{registrations}, libraries, traits);
-    }
+    StrictManager(const strict::Traits& traits, const std::string& classes)
+        : host_(classes, {registrations}, libraries, traits) {}
 
     Response ask(const Request& request) override {
         std::vector<const char*> properties;
@@ -60,25 +53,24 @@ class StrictManager : public Host {
             charactersOf(request.role), charactersOf(request.resultRole)};
         switch (request.operation) {
             case Operation::enumerateNames:
-                return host_->enumerateNames(request.path);
+                return host_.enumerateNames(request.path);
             case Operation::enumerate:
-                return host_->enumerate(request.path, properties);
+                return host_.enumerate(request.path, properties);
             case Operation::get:
-                return host_->get(request.path, properties);
+                return host_.get(request.path, properties);
             case Operation::associatorNames:
-                return host_->associatorNames(request.path, filter);
+                return host_.associatorNames(request.path, filter);
             case Operation::associators:
-                return host_->associators(request.path, filter, properties);
+                return host_.associators(request.path, filter, properties);
             case Operation::referenceNames:
-                return host_->referenceNames(request.path, filter);
+                return host_.referenceNames(request.path, filter);
             case Operation::references:
-                return host_->references(request.path, filter, properties);
+                return host_.references(request.path, filter, properties);
         }
         throw std::logic_error("no such operation");
     }
 
-    std::optional<test::FullSchema> full_;
-    std::optional<strict::StrictHost> host_;
+    strict::StrictHost host_;
 };
 
 template <typename Object>
@@ -232,12 +224,13 @@ std::vector<HostKind> hostKinds() {
     std::vector<HostKind> kinds;
     for (const strict::NamedTraits& each : strict::namedTraits) {
         // Only the whole schema has superclasses with defaults.
-        const bool wholeSchema = each.traits.parentsDefaults;
+        const bool whole = each.traits.parentsDefaults;
         kinds.push_back({each.name,
-                         [each, wholeSchema] {
-                             return std::make_unique<StrictManager>(each.traits, wholeSchema);
+                         [=] {
+                             return std::make_unique<StrictManager>(
+                                 each.traits, whole ? strict::wholeSchema : schema);
                          },
-                         wholeSchema, true});
+                         whole, true});
     }
     kinds.push_back({"EmbeddedManager", [] { return std::make_unique<EmbeddedManager>(); }});
     kinds.push_back({"Server", [] { return std::make_unique<Server>(); }});

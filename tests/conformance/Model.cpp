@@ -222,7 +222,7 @@ Response Model::responseTo(const Request& request) const {
             break;
         case Operation::get:
             for (const cimom::Instance& each : all()) {
-                if (textOf(each.path) == textOf(request.path)) {
+                if (each.path == request.path) {
                     found.push_back(each);
                 }
             }
@@ -235,7 +235,7 @@ Response Model::responseTo(const Request& request) const {
                 for (const std::size_t near : {std::size_t{0}, std::size_t{1}}) {
                     const cimom::Instance& source = objects_.at(each.ends.at(near));
                     const cimom::Instance& other = objects_.at(each.ends.at(1 - near));
-                    if (textOf(source.path) != textOf(request.path) ||
+                    if (!(source.path == request.path) ||
                         !isA(each.association, request.association) ||
                         !accepts(request.role, each.roles.at(near)) ||
                         !accepts(request.resultRole, each.roles.at(1 - near)) ||

@@ -13,7 +13,6 @@
 #include "HostRequests.h"
 #include "cimom/ObjectPathText.h"
 #include "cimom/Results.h"
-#include "kit/FullSchema.h"
 #include "kit/StrictHost.h"
 #include "kit/Tree.h"
 
@@ -159,8 +158,7 @@ TEST_P(ProvidersInAStrictHostTest, AnswerEveryRequestAsInTheEmbeddedObjectManage
 }
 
 TEST_P(ProvidersInAStrictHostTest, AnswerTheSameOverTheFullSchemaWithItsDefaults) {
-    const test::FullSchema schema;
-    StrictHost host = makeHost(schema.path());
+    StrictHost host = makeHost(strict::wholeSchema);
     expectTheSame(host);
 }
 
