@@ -74,7 +74,7 @@ CMPIStatus getInstance(CMPIInstanceMI* /*mi*/, const CMPIContext* ctx, const CMP
 CMPIStatus createInstance(CMPIInstanceMI* /*mi*/, const CMPIContext* /*ctx*/,
                           const CMPIResult* /*result*/, const CMPIObjectPath* /*path*/,
                           const CMPIInstance* /*instance*/) {
-    return refuse("Instances follow from the machine; none can be made");
+    return refuse("instances follow from the machine; none can be made");
 }
 
 CMPIStatus modify(CMPIInstanceMI* /*mi*/, const CMPIContext* ctx, const CMPIResult* result,
@@ -86,13 +86,13 @@ CMPIStatus modify(CMPIInstanceMI* /*mi*/, const CMPIContext* ctx, const CMPIResu
 
 CMPIStatus deleteInstance(CMPIInstanceMI* /*mi*/, const CMPIContext* /*ctx*/,
                           const CMPIResult* /*result*/, const CMPIObjectPath* /*path*/) {
-    return refuse("Instances follow from the machine; none can be deleted");
+    return refuse("instances follow from the machine; none can be deleted");
 }
 
 CMPIStatus execQuery(CMPIInstanceMI* /*mi*/, const CMPIContext* /*ctx*/,
                      const CMPIResult* /*result*/, const CMPIObjectPath* /*path*/,
                      const char* /*query*/, const char* /*language*/) {
-    return refuse("This provider does not understand queries");
+    return refuse("this provider does not understand queries");
 }
 
 CMPIStatus cleanupAssociations(CMPIAssociationMI* /*mi*/, const CMPIContext* /*ctx*/,

@@ -33,6 +33,8 @@ class Keys {
     explicit Keys(const CMPIObjectPath* path);
 
     [[nodiscard]] std::size_t size() const noexcept { return keys_.size(); }
+    [[nodiscard]] auto begin() const noexcept { return keys_.begin(); }
+    [[nodiscard]] auto end() const noexcept { return keys_.end(); }
     /// Null when there is no such key. Names compare without regard to case.
     [[nodiscard]] const Key* find(std::string_view name) const noexcept;
     /// The text of a key; empty when there is no such text key.

@@ -37,7 +37,7 @@ void setReference(const CMPIObjectPath* reference, const char* role, CMPIObjectP
     // The table of CMPI takes references that it does not change as if it might.
     if (!ProviderUtilities::setKeyProperty(path, role, const_cast<CMPIObjectPath*>(reference))) {
         throw Refusal(CMPI_RC_ERR_FAILED,
-                      std::string("The object manager takes no reference as ") + role);
+                      std::string("the object manager takes no reference as ") + role);
     }
 }
 
@@ -146,7 +146,7 @@ Object objectOf(const Request& request, const Link& link, Form form) {
     }
     if (!complete) {
         throw Refusal(CMPI_RC_ERR_FAILED,
-                      std::string("The object manager makes no instance of ") + association.name);
+                      std::string("the object manager makes no instance of ") + association.name);
     }
     object.instance = instance;
     return object;

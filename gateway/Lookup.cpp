@@ -12,7 +12,7 @@ namespace {
 
 [[noreturn]] void refuseKey(const ServedClass& served, const char* key, const char* what) {
     throw Refusal(CMPI_RC_ERR_INVALID_PARAMETER,
-                  std::string("The key ") + key + " of " + served.name + ' ' + what);
+                  std::string("the key ") + key + " of " + served.name + ' ' + what);
 }
 
 void requireKeys(const ServedClass& served, const Keys& keys) {
@@ -28,13 +28,20 @@ void requireKeys(const ServedClass& served, const Keys& keys) {
     }
     if (keys.size() != served.keys.size()) {
         throw Refusal(CMPI_RC_ERR_INVALID_PARAMETER,
-                      std::string("The path has a key that ") + served.name + " does not have");
+                      std::string("the path has a key that ") + served.name + " does not have");
     }
 }
 
-[[noreturn]] void notFound(const ServedClass& served) {
-    throw Refusal(CMPI_RC_ERR_NOT_FOUND,
-                  std::string("There is no such instance of ") + served.name);
+[[noreturn]] void notFound(const ServedClass& served, const Keys& keys) {
+    std::string text = std::string("there is no ") + served.name;
+    char separator = '.';
+    for (const Key& key : keys) {
+        const std::string value =
+            key.isText ? '"' + key.text + '"' : "a " + classNameOf(key.reference);
+        text += separator + key.name + '=' + value;
+        separator = ',';
+    }
+    throw Refusal(CMPI_RC_ERR_NOT_FOUND, text);
 }
 
 KeyTexts textsOf(const ServedClass& served, const Keys& keys) {
@@ -66,7 +73,7 @@ const ServedClass& servedClassOf(const Request& request) {
     const std::string name = classNameOf(request.path);
     const ServedClass* served = findClass(name);
     if (served == nullptr || served->server == Server::otherwise) {
-        throw Refusal(CMPI_RC_ERR_INVALID_CLASS, "This provider does not serve the class " + name);
+        throw Refusal(CMPI_RC_ERR_INVALID_CLASS, "this provider does not serve the class " + name);
     }
     return *served;
 }
@@ -76,7 +83,7 @@ Object find(const Request& request, const ServedClass& served, Form form) {
     requireKeys(served, keys);
     std::optional<Object> found = lookUp(request, served, keys, form);
     if (!found) {
-        notFound(served);
+        notFound(served, keys);
     }
     return *std::move(found);
 }
@@ -91,7 +98,7 @@ Link findLink(const Request& request, const ServedClass& served) {
     const CMPIObjectPath* farPath = keys.find(association.ends.at(1 - near).role)->reference;
     const ServedClass* nearClass = findClass(classNameOf(forEnd.path));
     if (nearClass == nullptr || !takes(association.ends.at(near), *nearClass)) {
-        notFound(served);
+        notFound(served, keys);
     }
     const Object object = find(forEnd, *nearClass, Form::names);
     for (const Link& link : linksOf(request, association, near, object)) {
@@ -100,7 +107,7 @@ Link findLink(const Request& request, const ServedClass& served) {
             return link;
         }
     }
-    notFound(served);
+    notFound(served, keys);
 }
 
 }  // namespace ZR::DHCPClientGateway

@@ -74,13 +74,13 @@ bool changes(const ServedClass& served, const CMPIInstance* present, const CMPII
         const bool writable =
             served.writable != nullptr && equalNames(served.writable, property->name);
         if (!writable && !sameValue(before, after)) {
-            throw Refusal(CMPI_RC_ERR_NOT_SUPPORTED, std::string("The property ") + property->name +
+            throw Refusal(CMPI_RC_ERR_NOT_SUPPORTED, std::string("the property ") + property->name +
                                                          " of " + served.name +
                                                          " cannot be changed");
         }
         if (writable && !isNull(after) && !textOf(after)) {
             throw Refusal(CMPI_RC_ERR_INVALID_PARAMETER,
-                          std::string("The property ") + property->name + " is a text");
+                          std::string("the property ") + property->name + " is a text");
         }
         change = change || (writable && configurationName(before) != configurationName(after));
     }
@@ -96,7 +96,7 @@ void modifyInstance(const Request& request, const CMPIInstance* wanted, const ch
                               ? objectOf(request, findLink(request, served), Form::instances)
                               : find(request, served, Form::instances);
     if (wanted == nullptr) {
-        throw Refusal(CMPI_RC_ERR_INVALID_PARAMETER, "There is no instance to take values from");
+        throw Refusal(CMPI_RC_ERR_INVALID_PARAMETER, "there is no instance to take values from");
     }
     if (!changes(served, before.instance, wanted, namedProperties(wanted, properties))) {
         return;
@@ -105,7 +105,7 @@ void modifyInstance(const Request& request, const CMPIInstance* wanted, const ch
     CMPIInstance* const changed = makeInstance(request, before.path);
     if (!ProviderUtilities::setProperty(changed, served.writable, name)) {
         throw Refusal(CMPI_RC_ERR_FAILED,
-                      std::string("The object manager takes no value for ") + served.writable);
+                      std::string("the object manager takes no value for ") + served.writable);
     }
     modify(request, before.path, changed);
     // The provider behind the gateway says OK to whatever became of it.

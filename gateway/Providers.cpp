@@ -1,8 +1,8 @@
 #include "Providers.h"
 
 #include <atomic>
+#include <utility>
 
-#include "Collector.h"
 #include "Refusal.h"
 #include "providerutilities/ProviderUtilities.h"
 
@@ -14,7 +14,7 @@ std::atomic<CMPIInstanceMI*> exactProvider = nullptr;
 
 void requireSuccess(const CMPIStatus& status, const char* className) {
     if (status.rc != CMPI_RC_OK) {
-        throw Refusal(status.rc, std::string("The provider of ") + className + " refuses");
+        throw Refusal(status.rc, std::string("the provider of ") + className + " refuses");
     }
 }
 
@@ -22,10 +22,23 @@ const CMPIObjectPath* pathOf(const CMPIInstance* instance) {
     return instance == nullptr ? nullptr : instance->ft->getObjectPath(instance, nullptr);
 }
 
-void keep(std::vector<Object>& objects, const CMPIObjectPath* path, const CMPIInstance* instance) {
-    if (path != nullptr) {
-        objects.push_back({path, instance, Keys(path)});
+/// An object of another provider by a path of the request's own: one that comes from the
+/// object manager may name a host, and references do not.
+std::optional<Object> withOwnPath(const Request& request, const CMPIInstance* instance) {
+    const CMPIObjectPath* path = pathOf(instance);
+    if (path == nullptr) {
+        return std::nullopt;
     }
+    Keys keys(path);
+    KeyTexts texts;
+    for (const Key& key : keys) {
+        if (!key.isText) {
+            return Object{path, instance, std::move(keys)};
+        }
+        texts.emplace_back(key.name.c_str(), key.text);
+    }
+    path = makePath(request, classNameOf(path).c_str(), texts);
+    return Object{path, instance, std::move(keys)};
 }
 
 }  // namespace
@@ -34,30 +47,33 @@ void useExactProvider(CMPIInstanceMI* provider) noexcept {
     exactProvider = provider;
 }
 
-std::vector<Object> ask(const Request& request, const ServedClass& served, Form form,
-                        const KeyTexts& narrowing) {
-    Collector collector;
+void askEach(const Request& request, const ServedClass& served, Form form,
+             const KeyTexts& narrowing, Collector::Take take) {
+    const Collector collector(std::move(take));
     CMPIInstanceMI* provider = exactProvider;
     const CMPIObjectPath* path =
         makePath(request, served.name, served.narrows ? narrowing : KeyTexts{});
+    const CMPIStatus status =
+        form == Form::names ? provider->ft->enumerateInstanceNames(provider, request.context,
+                                                                   collector.record(), path)
+                            : provider->ft->enumerateInstances(provider, request.context,
+                                                               collector.record(), path, nullptr);
+    collector.rethrow();
+    requireSuccess(status, served.name);
+}
+
+std::vector<Object> ask(const Request& request, const ServedClass& served, Form form,
+                        const KeyTexts& narrowing) {
     std::vector<Object> objects;
-    if (form == Form::names) {
-        requireSuccess(provider->ft->enumerateInstanceNames(provider, request.context,
-                                                            collector.record(), path),
-                       served.name);
-        objects.reserve(collector.paths().size());
-        for (const CMPIObjectPath* each : collector.paths()) {
-            keep(objects, each, nullptr);
-        }
-    } else {
-        requireSuccess(provider->ft->enumerateInstances(provider, request.context,
-                                                        collector.record(), path, nullptr),
-                       served.name);
-        objects.reserve(collector.instances().size());
-        for (const CMPIInstance* each : collector.instances()) {
-            keep(objects, pathOf(each), each);
-        }
-    }
+    askEach(request, served, form, narrowing,
+            [&objects](const CMPIObjectPath* path, const CMPIInstance* instance) {
+                if (path == nullptr) {
+                    path = pathOf(instance);
+                }
+                if (path != nullptr) {
+                    objects.push_back({path, instance, Keys(path)});
+                }
+            });
     return objects;
 }
 
@@ -69,8 +85,10 @@ std::vector<Object> askOthers(const Request& request, const ServedClass& served)
     // Without a provider of the class there are no associations with its objects.
     while (status.rc == CMPI_RC_OK && found != nullptr && found->ft->hasNext(found, nullptr) != 0) {
         const CMPIData next = found->ft->getNext(found, &status);
-        if (status.rc == CMPI_RC_OK) {
-            keep(objects, pathOf(next.value.inst), next.value.inst);
+        auto object =
+            status.rc == CMPI_RC_OK ? withOwnPath(request, next.value.inst) : std::nullopt;
+        if (object) {
+            objects.push_back(*std::move(object));
         }
     }
     return objects;
@@ -82,16 +100,14 @@ std::optional<Object> askOthersFor(const Request& request, const ServedClass& se
     CMPIStatus status{CMPI_RC_OK, nullptr};
     CMPIInstance* instance =
         request.broker->bft->getInstance(request.broker, request.context, path, nullptr, &status);
-    const CMPIObjectPath* found = status.rc == CMPI_RC_OK ? pathOf(instance) : nullptr;
+    auto found = status.rc == CMPI_RC_OK ? withOwnPath(request, instance) : std::nullopt;
     // Some object managers give what the provider delivers, whatever its keys.
-    if (found == nullptr || !(Keys(found) == Keys(path))) {
-        return std::nullopt;
-    }
-    return Object{found, instance, Keys(found)};
+    return found && found->keys == Keys(path) ? std::move(found) : std::nullopt;
 }
 
 void modify(const Request& request, const CMPIObjectPath* path, const CMPIInstance* instance) {
-    Collector collector;
+    // It hands nothing over.
+    const Collector collector([](const CMPIObjectPath*, const CMPIInstance*) {});
     CMPIInstanceMI* provider = exactProvider;
     requireSuccess(provider->ft->modifyInstance(provider, request.context, collector.record(), path,
                                                 instance, nullptr),
@@ -107,7 +123,7 @@ CMPIObjectPath* makePath(const Request& request, const char* className, const Ke
     }
     if (!complete) {
         throw Refusal(CMPI_RC_ERR_FAILED,
-                      std::string("The object manager makes no path of ") + className);
+                      std::string("the object manager makes no path of ") + className);
     }
     return path;
 }
@@ -116,7 +132,7 @@ CMPIInstance* makeInstance(const Request& request, const CMPIObjectPath* path) {
     CMPIInstance* instance = ProviderUtilities::createInstance(request.broker, path);
     if (instance == nullptr) {
         throw Refusal(CMPI_RC_ERR_FAILED,
-                      "The object manager makes no instance of " + classNameOf(path));
+                      "the object manager makes no instance of " + classNameOf(path));
     }
     return instance;
 }

@@ -1,6 +1,7 @@
 #include "UnchangedReason.h"
 
 #include <fcntl.h>
+#include <sys/stat.h>
 #include <sys/statvfs.h>
 #include <unistd.h>
 
@@ -27,15 +28,19 @@ Refusal whyNameUnchanged(const std::string& interfaceName, const std::string& wa
                          const std::string& now) {
     if (wanted.find_first_of(std::string_view("\n\r\0", 3)) != std::string::npos) {
         return {CMPI_RC_ERR_FAILED,
-                "A configuration name is one line: it cannot have a line break"};
+                "a configuration name is one line: it cannot have a line break"};
     }
     const auto path = InterfaceFile::path(PlatformUtilities::getKestraDataDir(), interfaceName);
     if (!path) {
-        return {CMPI_RC_ERR_FAILED, "No file can be named after the interface"};
+        return {CMPI_RC_ERR_FAILED, "no file can be named after the interface"};
     }
     if (::faccessat(AT_FDCWD, path->c_str(), F_OK, AT_EACCESS) != 0) {
         return {errno == EACCES ? CMPI_RC_ERR_ACCESS_DENIED : CMPI_RC_ERR_FAILED,
                 *path + ": " + std::strerror(errno)};
+    }
+    struct stat status {};
+    if (::stat(path->c_str(), &status) == 0 && !S_ISREG(status.st_mode)) {
+        return {CMPI_RC_ERR_FAILED, *path + " is not a regular file"};
     }
     for (const int mode : {R_OK, W_OK}) {
         if (::faccessat(AT_FDCWD, path->c_str(), mode, AT_EACCESS) != 0) {

@@ -11,6 +11,7 @@
 #include "providerutilities/ProviderUtilities.h"
 #include "tklogger/TKLogger.h"
 #include "zrcommon/LogLevel.h"
+#include "zrcommon/Strings.h"
 #include "zrlinux/LiveSource.h"
 
 /// The CMPI side of the neighbour provider: enumerate, enumerate names and get.
@@ -22,8 +23,33 @@ std::atomic<const CMPIBroker*> broker = nullptr;
 
 const std::string loggerNeighbours = "ZR.Neighbours";
 
+/// What a request is refused with.
+struct Refusal {
+    CMPIrc code;
+    std::string message;
+};
+
 CMPIStatus statusOf(CMPIrc code) {
     return {code, nullptr};
+}
+
+/// The message belongs to the host, and ends with the request.
+CMPIStatus statusOf(const Refusal& refusal) {
+    const CMPIBroker* host = broker;
+    CMPIStatus status{refusal.code, nullptr};
+    try {
+        if (host != nullptr) {
+            status.msg = host->eft->newString(host, refusal.message.c_str(), nullptr);
+        }
+    } catch (const std::exception&) {
+        // The code says what matters most, and nothing else can be told this host.
+        status.msg = nullptr;
+    }
+    return status;
+}
+
+CMPIStatus notSupported() {
+    return statusOf(Refusal{CMPI_RC_ERR_NOT_SUPPORTED, "This provider only reads"});
 }
 
 std::string classNameOf(const CMPIObjectPath* path) {
@@ -52,6 +78,9 @@ struct PropertySetter {
     bool operator()(const std::string& text) const {
         return ProviderUtilities::setProperty(instance, name, text);
     }
+    bool operator()(std::monostate /*null*/) const {
+        return ProviderUtilities::setNull(instance, name, CMPI_uint16);
+    }
     bool operator()(unsigned short number) const {
         return ProviderUtilities::setProperty(instance, name, number);
     }
@@ -60,70 +89,104 @@ struct PropertySetter {
     }
 };
 
+/// Whether a property list, null for all properties, has a property.
+bool lists(const char** properties, const std::string& name) {
+    if (properties == nullptr) {
+        return true;
+    }
+    for (const char** each = properties; *each != nullptr; ++each) {
+        if (equalNames(*each, name)) {
+            return true;
+        }
+    }
+    return false;
+}
+
 /// Null when the broker refuses any part of it.
-CMPIInstance* makeInstance(const NeighbourObject& object, const std::string& nameSpace) {
+CMPIInstance* makeInstance(const NeighbourObject& object, const std::string& nameSpace,
+                           const char** properties) {
     CMPIInstance* instance = ProviderUtilities::createInstance(broker, makePath(object, nameSpace));
     bool complete = instance != nullptr;
     for (const auto& [name, value] : object.keys) {
-        complete = complete && PropertySetter{instance, name.c_str()}(value);
+        if (lists(properties, name)) {
+            complete = complete && PropertySetter{instance, name.c_str()}(value);
+        }
     }
     for (const auto& [name, value] : object.properties) {
-        complete = complete && std::visit(PropertySetter{instance, name.c_str()}, value);
+        if (lists(properties, name)) {
+            complete = complete && std::visit(PropertySetter{instance, name.c_str()}, value);
+        }
     }
     return complete ? instance : nullptr;
 }
 
-/// Whether the object agrees with every text key of the path.
-bool agrees(const NeighbourObject& object, const CMPIObjectPath* path) {
-    Moniker keys;
-    ProviderUtilities::transformObjectPathToMoniker(path, keys);
-    for (std::size_t i = 0; i < keys.getKeyCount(); ++i) {
-        std::string name;
+/// Throws Refusal unless the path has the keys of its class and no others.
+void requireKeys(const CMPIObjectPath* path, const std::string& className) {
+    const auto names = keysOf(className);
+    for (const char* name : names) {
         std::string value;
-        if (!keys.selectKey(i) || !keys.getName(name) || !keys.getValue(value)) {
-            continue;
-        }
-        const std::string* actual = object.key(name);
-        if (actual == nullptr || *actual != value) {
-            return false;
+        if (!ProviderUtilities::getKeyProperty(path, name, value)) {
+            throw Refusal{CMPI_RC_ERR_INVALID_PARAMETER, std::string("The key ") + name + " of " +
+                                                             className +
+                                                             " is missing, or is not a text"};
         }
     }
-    return true;
+    if (ProviderUtilities::getKeyCount(path) != names.size()) {
+        throw Refusal{CMPI_RC_ERR_INVALID_PARAMETER,
+                      "The path has a key that " + className + " does not have"};
+    }
+}
+
+/// Whether the object is the one that a path with all keys names.
+bool agrees(const NeighbourObject& object, const CMPIObjectPath* path) {
+    return equalNames(object.className, classNameOf(path)) &&
+           std::all_of(object.keys.begin(), object.keys.end(), [path](const auto& key) {
+               std::string value;
+               return ProviderUtilities::getKeyProperty(path, key.first.c_str(), value) &&
+                      value == key.second;
+           });
 }
 
 /// Hands the objects of the path's class, and its namespace, to `give`, and ends the
-/// result unless that returns an error. Nothing that is thrown on the way reaches the
-/// object manager.
+/// result. Nothing that is thrown on the way reaches the object manager.
 template <typename Give>
 CMPIStatus serve(const CMPIResult* result, const CMPIObjectPath* path, const Give& give) {
     try {
         const std::string className = classNameOf(path);
         if (!isNeighbourClass(className)) {
-            return statusOf(CMPI_RC_ERR_INVALID_CLASS);
+            throw Refusal{CMPI_RC_ERR_INVALID_CLASS,
+                          "This provider does not serve the class " + className};
         }
         const std::string nameSpace = ProviderUtilities::getNamespace(path);
         std::string name;
         ProviderUtilities::getKeyProperty(path, "Name", name);
-        const CMPIrc code = give(objectsOf(className, name), nameSpace);
-        if (code == CMPI_RC_OK) {
-            result->ft->returnDone(result);
-        }
-        return statusOf(code);
+        give(objectsOf(className, name), nameSpace);
+        result->ft->returnDone(result);
+        return statusOf(CMPI_RC_OK);
+    } catch (const Refusal& refusal) {
+        return statusOf(refusal);
     } catch (const std::exception& exception) {
         TKLog::TKLogger::logLevelMessage("neighbours/DHCPClientNeighbours", __func__, __LINE__,
                                          loggerNeighbours, LogLevel::failure, nullptr, 0, 0,
                                          exception.what());
-        return statusOf(CMPI_RC_ERR_FAILED);
+        return statusOf(Refusal{CMPI_RC_ERR_FAILED, exception.what()});
+    }
+}
+
+void requireTaken(bool taken) {
+    if (!taken) {
+        throw Refusal{CMPI_RC_ERR_FAILED, "The object manager refuses a part of the result"};
     }
 }
 
 /// A null that the broker made never reaches the result.
-bool returnPath(const CMPIResult* result, const CMPIObjectPath* path) {
-    return path != nullptr && result->ft->returnObjectPath(result, path).rc == CMPI_RC_OK;
+void returnPath(const CMPIResult* result, const CMPIObjectPath* path) {
+    requireTaken(path != nullptr && result->ft->returnObjectPath(result, path).rc == CMPI_RC_OK);
 }
 
-bool returnInstance(const CMPIResult* result, const CMPIInstance* instance) {
-    return instance != nullptr && result->ft->returnInstance(result, instance).rc == CMPI_RC_OK;
+void returnInstance(const CMPIResult* result, const CMPIInstance* instance) {
+    requireTaken(instance != nullptr &&
+                 result->ft->returnInstance(result, instance).rc == CMPI_RC_OK);
 }
 
 CMPIStatus cleanup(CMPIInstanceMI* /*mi*/, const CMPIContext* /*ctx*/,
@@ -135,61 +198,57 @@ CMPIStatus enumerateInstanceNames(CMPIInstanceMI* /*mi*/, const CMPIContext* /*c
                                   const CMPIResult* result, const CMPIObjectPath* path) {
     return serve(result, path, [&](const auto& objects, const std::string& nameSpace) {
         for (const NeighbourObject& object : objects) {
-            if (!returnPath(result, makePath(object, nameSpace))) {
-                return CMPI_RC_ERR_FAILED;
-            }
+            returnPath(result, makePath(object, nameSpace));
         }
-        return CMPI_RC_OK;
     });
 }
 
 CMPIStatus enumerateInstances(CMPIInstanceMI* /*mi*/, const CMPIContext* /*ctx*/,
                               const CMPIResult* result, const CMPIObjectPath* path,
-                              const char** /*properties*/) {
+                              const char** properties) {
     return serve(result, path, [&](const auto& objects, const std::string& nameSpace) {
         for (const NeighbourObject& object : objects) {
-            if (!returnInstance(result, makeInstance(object, nameSpace))) {
-                return CMPI_RC_ERR_FAILED;
-            }
+            returnInstance(result, makeInstance(object, nameSpace, properties));
         }
-        return CMPI_RC_OK;
     });
 }
 
 CMPIStatus getInstance(CMPIInstanceMI* /*mi*/, const CMPIContext* /*ctx*/, const CMPIResult* result,
-                       const CMPIObjectPath* path, const char** /*properties*/) {
+                       const CMPIObjectPath* path, const char** properties) {
     return serve(result, path, [&](const auto& objects, const std::string& nameSpace) {
-        for (const NeighbourObject& object : objects) {
-            if (agrees(object, path)) {
-                return returnInstance(result, makeInstance(object, nameSpace)) ? CMPI_RC_OK
-                                                                               : CMPI_RC_ERR_FAILED;
-            }
+        const std::string className = classNameOf(path);
+        requireKeys(path, className);
+        const auto found =
+            std::find_if(objects.begin(), objects.end(),
+                         [path](const NeighbourObject& object) { return agrees(object, path); });
+        if (found == objects.end()) {
+            throw Refusal{CMPI_RC_ERR_NOT_FOUND, "There is no such instance of " + className};
         }
-        return CMPI_RC_ERR_NOT_FOUND;
+        returnInstance(result, makeInstance(*found, nameSpace, properties));
     });
 }
 
 CMPIStatus createInstance(CMPIInstanceMI* /*mi*/, const CMPIContext* /*ctx*/,
                           const CMPIResult* /*result*/, const CMPIObjectPath* /*path*/,
                           const CMPIInstance* /*instance*/) {
-    return statusOf(CMPI_RC_ERR_NOT_SUPPORTED);
+    return notSupported();
 }
 
 CMPIStatus modifyInstance(CMPIInstanceMI* /*mi*/, const CMPIContext* /*ctx*/,
                           const CMPIResult* /*result*/, const CMPIObjectPath* /*path*/,
                           const CMPIInstance* /*instance*/, const char** /*properties*/) {
-    return statusOf(CMPI_RC_ERR_NOT_SUPPORTED);
+    return notSupported();
 }
 
 CMPIStatus deleteInstance(CMPIInstanceMI* /*mi*/, const CMPIContext* /*ctx*/,
                           const CMPIResult* /*result*/, const CMPIObjectPath* /*path*/) {
-    return statusOf(CMPI_RC_ERR_NOT_SUPPORTED);
+    return notSupported();
 }
 
 CMPIStatus execQuery(CMPIInstanceMI* /*mi*/, const CMPIContext* /*ctx*/,
                      const CMPIResult* /*result*/, const CMPIObjectPath* /*path*/,
                      const char* /*query*/, const char* /*language*/) {
-    return statusOf(CMPI_RC_ERR_NOT_SUPPORTED);
+    return notSupported();
 }
 
 constexpr int cmpiLevel = 200;

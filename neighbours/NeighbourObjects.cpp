@@ -22,30 +22,43 @@ constexpr unsigned short protocolIPv4 = 4096;
 constexpr unsigned short originDHCP =
     NodeLexicon::addressOriginOf(static_cast<unsigned int>(NodeLexicon::AddressSource::DHCP));
 
+/// What an enabled element may have a state of, and these are not known to have.
+void addUnknownStates(NeighbourObject& object) {
+    for (const char* name :
+         {"EnabledState", "RequestedState", "EnabledDefault", "TransitioningToState"}) {
+        object.properties.emplace_back(name, std::monostate{});
+    }
+}
+
 NeighbourObject computerObject(const ComputerFacts& computer) {
     const char* className = computer.isServiceProcessor ? serviceProcessorSystem : computerSystem;
     const unsigned short dedicated =
         computer.isServiceProcessor ? managementController : notDedicated;
-    return {className,
-            {{"CreationClassName", className}, {"Name", computer.name}},
-            {{"ElementName", computer.name},
-             {"NameFormat", std::string("Other")},
-             {"Dedicated", std::vector<unsigned short>{dedicated}}}};
+    NeighbourObject object{className,
+                           {{"CreationClassName", className}, {"Name", computer.name}},
+                           {{"ElementName", computer.name},
+                            {"NameFormat", std::string("Other")},
+                            {"Dedicated", std::vector<unsigned short>{dedicated}}}};
+    addUnknownStates(object);
+    return object;
 }
 
 NeighbourObject endpointObject(const InterfaceFacts& interface) {
     // The class of the system is the same for the service processor's interfaces:
     // so the association names them.
-    return {ipProtocolEndpoint,
-            {{"SystemCreationClassName", computerSystem},
-             {"SystemName", interface.systemName},
-             {"CreationClassName", ipProtocolEndpoint},
-             {"Name", interface.name}},
-            {{"ElementName", interface.name},
-             {"NameFormat", std::string("NICName")},
-             {"ProtocolIFType", protocolIPv4},
-             {"IPv4Address", interface.ipv4Address},
-             {"AddressOrigin", NodeLexicon::addressOriginOf(interface.addressSource)}}};
+    NeighbourObject object{
+        ipProtocolEndpoint,
+        {{"SystemCreationClassName", computerSystem},
+         {"SystemName", interface.systemName},
+         {"CreationClassName", ipProtocolEndpoint},
+         {"Name", interface.name}},
+        {{"ElementName", interface.name},
+         {"NameFormat", std::string("NICName")},
+         {"ProtocolIFType", protocolIPv4},
+         {"IPv4Address", interface.ipv4Address},
+         {"AddressOrigin", NodeLexicon::addressOriginOf(interface.addressSource)}}};
+    addUnknownStates(object);
+    return object;
 }
 
 NeighbourObject assignmentObject(const InterfaceFacts& interface) {
@@ -95,16 +108,22 @@ std::vector<NeighbourObject> assignments(const std::string& /*name*/) {
     return objects;
 }
 
+constexpr std::array computerKeys{"CreationClassName", "Name"};
+constexpr std::array endpointKeys{"SystemCreationClassName", "SystemName", "CreationClassName",
+                                  "Name"};
+constexpr std::array assignmentKeys{"InstanceID"};
+
 struct NeighbourClass {
     const char* name;
+    std::span<const char* const> keys;
     std::vector<NeighbourObject> (*objects)(const std::string& name);
 };
 
 constexpr std::array<NeighbourClass, 4> neighbourClasses{{
-    {computerSystem, &computers},
-    {serviceProcessorSystem, &serviceProcessors},
-    {ipProtocolEndpoint, &endpoints},
-    {ipAssignmentSettingData, &assignments},
+    {computerSystem, computerKeys, &computers},
+    {serviceProcessorSystem, computerKeys, &serviceProcessors},
+    {ipProtocolEndpoint, endpointKeys, &endpoints},
+    {ipAssignmentSettingData, assignmentKeys, &assignments},
 }};
 
 const NeighbourClass* find(const std::string& className) {
@@ -116,15 +135,13 @@ const NeighbourClass* find(const std::string& className) {
 
 }  // namespace
 
-const std::string* NeighbourObject::key(const std::string& name) const {
-    const auto found = std::find_if(keys.begin(), keys.end(), [&name](const auto& entry) {
-        return equalNames(entry.first, name);
-    });
-    return found == keys.end() ? nullptr : &found->second;
-}
-
 bool isNeighbourClass(const std::string& className) {
     return find(className) != nullptr;
+}
+
+std::span<const char* const> keysOf(const std::string& className) {
+    const NeighbourClass* entry = find(className);
+    return entry == nullptr ? std::span<const char* const>{} : entry->keys;
 }
 
 std::vector<NeighbourObject> objectsOf(const std::string& className, const std::string& name) {

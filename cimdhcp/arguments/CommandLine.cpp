@@ -248,7 +248,7 @@ class CommandLineReader::Parser {
             ->envname("CIMDHCP_PROVIDER_DIR")
             ->group(advancedGroup);
         app_.add_flag("--exact", line_.options.exact,
-                      "The exact provider, without the gateway in front of it")
+                      "The exact provider, not the gateway before it")
             ->group(advancedGroup);
     }
 

@@ -24,6 +24,11 @@ Response responseOf(const char* operation, cimom::PathsResult result) {
 }
 
 Response responseOf(const char* operation, cimom::InstancesResult result) {
+    for (auto& instance : result.instances) {
+        if (instance) {
+            leaveOutNulls(*instance);
+        }
+    }
     return {operation,
             std::move(result.status),
             result.returnDoneCalls,

@@ -197,8 +197,9 @@ Response RemoteClient::pathsOf(const OperationRequest& request) {
 Response RemoteClient::instancesOf(const OperationRequest& request) {
     return responseTo(request,
                       [&request](const cimom::wbem::XmlElement& element, Response& response) {
-                          response.instances.emplace_back(
+                          auto& instance = response.instances.emplace_back(
                               cimom::wbem::readReturnedInstance(element, request.nameSpace()));
+                          leaveOutNulls(*instance);
                       });
 }
 
@@ -222,10 +223,6 @@ Response RemoteClient::get(const cimom::ObjectPath& path) {
     Response response = instancesOf(request);
     for (auto& instance : response.instances) {
         instance->path = wholePath(*instance, path, findClass(instance->path.className));
-        // Servers add what the class has and the provider did not say, as null, which
-        // means the same as leaving it out (DSP0201, 5.2.5).
-        std::erase_if(instance->properties,
-                      [](const cimom::NamedValue& each) { return each.value.isNull(); });
     }
     return response;
 }

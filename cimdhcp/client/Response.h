@@ -21,4 +21,9 @@ struct Response {
     bool operator==(const Response&) const = default;
 };
 
+/// Takes away the properties without a value. Providers and servers may add what the class
+/// has and they do not know as null, which means the same as leaving it out (DSP0201,
+/// 5.2.5).
+void leaveOutNulls(cimom::Instance& instance);
+
 }  // namespace cimdhcp

@@ -272,6 +272,9 @@ CMPIData getProperty(const CMPIInstance* self, const char* name, CMPIStatus* rc)
 CMPIStatus setProperty(const CMPIInstance* self, const char* name, const CMPIValue* value,
                        CMPIType type) {
     return call(Function::setProperty, [&] {
+        if (value == nullptr) {
+            return realOf(self)->ft->setProperty(realOf(self), name, nullptr, type);
+        }
         const CMPIValue real = behind(*value, type);
         return realOf(self)->ft->setProperty(realOf(self), name, &real, type);
     });

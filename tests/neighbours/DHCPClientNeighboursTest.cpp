@@ -60,6 +60,9 @@ std::string textOf(const cimom::Scalar& scalar) {
 }
 
 std::string textOf(const cimom::Value& value) {
+    if (value.isNull()) {
+        return "null";
+    }
     if (const cimom::Scalar* scalar = value.scalar()) {
         return textOf(*scalar);
     }
@@ -86,6 +89,7 @@ class NeighboursTest : public test::TreeTest {
         Texts paths;
         std::vector<cimom::Instance> instances;
         unsigned returnDoneCalls = 0;
+        std::string message;
     };
 
     void SetUp() override {
@@ -112,8 +116,10 @@ class NeighboursTest : public test::TreeTest {
         const CMPIObjectPath* record = broker_.standIn(cimom::broker::toRecord(
             arena, &repository_, cimom::parseObjectPath("root/cimv2:" + path)));
         const CMPIStatus status = call(context, broker_.standIn(handedOver.record()), record);
-        EXPECT_EQ(status.msg, nullptr);
-        Response response{status.rc, {}, {}, handedOver.returnDoneCalls()};
+        Response response{status.rc, {}, {}, handedOver.returnDoneCalls(), ""};
+        if (status.msg != nullptr) {
+            response.message = status.msg->ft->getCharPtr(status.msg, nullptr);
+        }
         for (const auto& each : paths.objects) {
             response.paths.push_back(toText(each.value()));
         }
@@ -133,9 +139,9 @@ class NeighboursTest : public test::TreeTest {
             return table().enumerateInstances(mi_, context, result, record, nullptr);
         });
     }
-    Response get(const std::string& path) {
-        return request(Kind::instances, path, [this](auto* context, auto* result, auto* record) {
-            return table().getInstance(mi_, context, result, record, nullptr);
+    Response get(const std::string& path, const char** properties = nullptr) {
+        return request(Kind::instances, path, [=, this](auto* context, auto* result, auto* record) {
+            return table().getInstance(mi_, context, result, record, properties);
         });
     }
 
@@ -169,13 +175,15 @@ TEST_F(NeighboursTest, TableNamesItselfAndHasNoEmptySlot) {
 }
 
 TEST_F(NeighboursTest, NothingCanBeChanged) {
+    const cimom::broker::RequestScope scope;
     for (const CMPIStatus status :
          {table().createInstance(nullptr, nullptr, nullptr, nullptr, nullptr),
           table().modifyInstance(nullptr, nullptr, nullptr, nullptr, nullptr, nullptr),
           table().deleteInstance(nullptr, nullptr, nullptr, nullptr),
           table().execQuery(nullptr, nullptr, nullptr, nullptr, nullptr, nullptr)}) {
         EXPECT_EQ(status.rc, CMPI_RC_ERR_NOT_SUPPORTED);
-        EXPECT_EQ(status.msg, nullptr);
+        ASSERT_NE(status.msg, nullptr);
+        EXPECT_STREQ(status.msg->ft->getCharPtr(status.msg, nullptr), "This provider only reads");
     }
 }
 
@@ -207,7 +215,9 @@ TEST_F(NeighboursTest, InstancesHaveTheirKeysAsPropertiesToo) {
     ASSERT_EQ(computers.instances.size(), 1U);
     EXPECT_THAT(propertiesOf(computers.instances[0]),
                 ElementsAre("CreationClassName=QVXZR_ComputerSystem", "Name=" + hostName(),
-                            "ElementName=" + hostName(), "NameFormat=Other", "Dedicated={0}"));
+                            "ElementName=" + hostName(), "NameFormat=Other", "Dedicated={0}",
+                            "EnabledState=null", "RequestedState=null", "EnabledDefault=null",
+                            "TransitioningToState=null"));
     EXPECT_EQ(computers.returnDoneCalls, 1U);
     const Response endpoints = instances("QVXZR_IPProtocolEndpoint");
     ASSERT_EQ(endpoints.instances.size(), 1U);
@@ -216,7 +226,8 @@ TEST_F(NeighboursTest, InstancesHaveTheirKeysAsPropertiesToo) {
         ElementsAre("SystemCreationClassName=QVXZR_ComputerSystem", "SystemName=" + hostName(),
                     "CreationClassName=QVXZR_IPProtocolEndpoint", "Name=eth0", "ElementName=eth0",
                     "NameFormat=NICName", "ProtocolIFType=4096", "IPv4Address=192.0.2.10",
-                    "AddressOrigin=4"));
+                    "AddressOrigin=4", "EnabledState=null", "RequestedState=null",
+                    "EnabledDefault=null", "TransitioningToState=null"));
     const Response assignments = instances("QVXZR_IPAssignmentSettingData");
     ASSERT_EQ(assignments.instances.size(), 2U);
     EXPECT_THAT(
@@ -238,6 +249,8 @@ TEST_F(NeighboursTest, ForeignClassIsInvalidWithoutResultsOrAnEnd) {
     for (const char* name : {"CIM_ComputerSystem", "QVXZR_DHCPSettingData", "No_SuchClass"}) {
         for (const Response& response : {names(name), instances(name), get(name)}) {
             EXPECT_EQ(response.code, CMPI_RC_ERR_INVALID_CLASS) << name;
+            EXPECT_EQ(response.message,
+                      std::string("This provider does not serve the class ") + name);
             EXPECT_THAT(response.paths, IsEmpty());
             EXPECT_THAT(response.instances, IsEmpty());
             EXPECT_EQ(response.returnDoneCalls, 0U);
@@ -259,28 +272,59 @@ TEST_F(NeighboursTest, GetGivesTheOneInstanceThatAgreesWithEveryKey) {
 }
 
 TEST_F(NeighboursTest, GetComparesKeyNamesWithoutAndValuesWithCase) {
-    EXPECT_EQ(get(R"(QVXZR_IPProtocolEndpoint.NAME="eth0")").instances.size(), 1U);
-    EXPECT_EQ(get(R"(QVXZR_IPProtocolEndpoint.Name="ETH0")").code, CMPI_RC_ERR_NOT_FOUND);
+    EXPECT_EQ(
+        get(R"(QVXZR_IPAssignmentSettingData.INSTANCEID="Computer%eth0%dhcp")").instances.size(),
+        1U);
+    EXPECT_EQ(get(R"(QVXZR_IPAssignmentSettingData.InstanceID="computer%eth0%dhcp")").code,
+              CMPI_RC_ERR_NOT_FOUND);
 }
 
-TEST_F(NeighboursTest, GetOfAPathWithoutKeysGivesTheFirst) {
-    const Response response = get("QVXZR_IPAssignmentSettingData");
+TEST_F(NeighboursTest, GetGivesThePropertiesOfTheList) {
+    const char* some[] = {"elementname", "NoSuchProperty", nullptr};
+    const std::string path = R"(QVXZR_IPAssignmentSettingData.InstanceID="Computer%eth1%dhcp")";
+    const Response response = get(path, some);
     ASSERT_EQ(response.instances.size(), 1U);
-    EXPECT_EQ(textOf(*response.instances[0].property("InstanceID")), "Computer%eth0%dhcp");
+    EXPECT_THAT(propertiesOf(response.instances[0]), ElementsAre("ElementName=eth1"));
+    const char* none[] = {nullptr};
+    EXPECT_THAT(propertiesOf(get(path, none).instances.at(0)), IsEmpty());
+}
+
+TEST_F(NeighboursTest, GetWantsTheKeysOfTheClassAndNoOthers) {
+    for (const auto& [path, message] : std::vector<std::pair<std::string, std::string>>{
+             {"QVXZR_IPAssignmentSettingData",
+              "The key InstanceID of QVXZR_IPAssignmentSettingData is missing, or is not a text"},
+             {"QVXZR_IPAssignmentSettingData.InstanceID=4",
+              "The key InstanceID of QVXZR_IPAssignmentSettingData is missing, or is not a text"},
+             {R"(QVXZR_IPAssignmentSettingData.InstanceID="Computer%eth0%dhcp",More="x")",
+              "The path has a key that QVXZR_IPAssignmentSettingData does not have"},
+             {R"(QVXZR_ComputerSystem.Name="x")",
+              "The key CreationClassName of QVXZR_ComputerSystem is missing, or is not a text"}}) {
+        const Response response = get(path);
+        EXPECT_EQ(response.code, CMPI_RC_ERR_INVALID_PARAMETER) << path;
+        EXPECT_EQ(response.message, message);
+        EXPECT_THAT(response.instances, IsEmpty()) << path;
+    }
 }
 
 TEST_F(NeighboursTest, MissingObjectIsNotFoundAndLeavesTheResultOpen) {
-    for (const char* path :
-         {R"(QVXZR_ComputerSystem.Name="elsewhere")", R"(QVXZR_SPComputerSystem.Name="elsewhere")",
-          R"(QVXZR_IPProtocolEndpoint.Name="eth1")",  // it has no address
-          R"(QVXZR_IPProtocolEndpoint.SystemName="elsewhere",Name="eth0")",
-          R"(QVXZR_IPProtocolEndpoint.Name="eth0",NoSuchKey="x")",
-          R"(QVXZR_IPAssignmentSettingData.InstanceID="Computer%eth9%dhcp")"}) {
+    const std::string endpoint =
+        R"(QVXZR_IPProtocolEndpoint.SystemCreationClassName="QVXZR_ComputerSystem",)"
+        R"(CreationClassName="QVXZR_IPProtocolEndpoint",)";
+    for (const std::string& path : std::vector<std::string>{
+             R"(QVXZR_ComputerSystem.CreationClassName="QVXZR_ComputerSystem",Name="elsewhere")",
+             // It is there, but of another class.
+             R"(QVXZR_ComputerSystem.CreationClassName="QVXZR_SPComputerSystem",Name="BMC:-1")",
+             endpoint + ofHost(R"(SystemName="@",Name="eth1")"),  // it has no address
+             endpoint + R"(SystemName="elsewhere",Name="eth0")",
+             R"(QVXZR_IPAssignmentSettingData.InstanceID="Computer%eth9%dhcp")"}) {
         const Response response = get(path);
         EXPECT_EQ(response.code, CMPI_RC_ERR_NOT_FOUND) << path;
+        EXPECT_EQ(response.message,
+                  "There is no such instance of " + path.substr(0, path.find('.')));
         EXPECT_THAT(response.instances, IsEmpty()) << path;
         EXPECT_EQ(response.returnDoneCalls, 0U) << path;
     }
+    EXPECT_EQ(get(endpoint + ofHost(R"(SystemName="@",Name="eth0")")).instances.size(), 1U);
 }
 
 // A broker that fails.
@@ -304,7 +348,11 @@ TEST_F(NeighboursTest, ObjectThatTheBrokerRefusesInAnyPartFailsTheRequest) {
         const Response response = instances("QVXZR_ComputerSystem");
         EXPECT_EQ(response.code, CMPI_RC_ERR_FAILED) << nameOf(function);
         EXPECT_THAT(response.instances, IsEmpty()) << nameOf(function);
-        EXPECT_EQ(get("QVXZR_ComputerSystem").code, CMPI_RC_ERR_FAILED) << nameOf(function);
+        EXPECT_EQ(get(ofHost(R"(QVXZR_ComputerSystem.CreationClassName="QVXZR_ComputerSystem",)"
+                             R"(Name="@")"))
+                      .code,
+                  CMPI_RC_ERR_FAILED)
+            << nameOf(function);
     }
 }
 
@@ -317,13 +365,16 @@ TEST_F(NeighboursTest, EveryCallMayFailAndNoneIsFatal) {
             }
             for (unsigned call = 1;; ++call) {
                 broker_.fail(function, call, fault);
-                const Response response = get(R"(QVXZR_ComputerSystem.Name="BMC:-1")");
+                const Response response =
+                    get(R"(QVXZR_SPComputerSystem.CreationClassName="QVXZR_SPComputerSystem",)"
+                        R"(Name="BMC:-1")");
                 if (broker_.calls(function) < call) {
                     break;
                 }
-                EXPECT_THAT(response.code,
-                            ::testing::AnyOf(CMPI_RC_OK, CMPI_RC_ERR_FAILED, CMPI_RC_ERR_NOT_FOUND,
-                                             CMPI_RC_ERR_INVALID_CLASS))
+                EXPECT_THAT(
+                    response.code,
+                    ::testing::AnyOf(CMPI_RC_OK, CMPI_RC_ERR_FAILED, CMPI_RC_ERR_NOT_FOUND,
+                                     CMPI_RC_ERR_INVALID_PARAMETER, CMPI_RC_ERR_INVALID_CLASS))
                     << nameOf(function) << ' ' << call;
             }
         }
@@ -391,7 +442,8 @@ TEST_F(NeighboursLibraryTest, StandardClassReachesHostAndServiceProcessor) {
 
 TEST_F(NeighboursLibraryTest, MissingObjectIsNotFound) {
     const auto result = manager_.getInstance(
-        cimom::parseObjectPath(R"(root/cimv2:QVXZR_SPComputerSystem.Name="x")"));
+        cimom::parseObjectPath(R"(root/cimv2:QVXZR_SPComputerSystem.)"
+                               R"(CreationClassName="QVXZR_SPComputerSystem",Name="x")"));
     EXPECT_EQ(result.status.code, CMPI_RC_ERR_NOT_FOUND);
 }
 

@@ -280,6 +280,11 @@ bool ProviderUtilities::setProperty(CMPIInstance* instance, const char* name,
     return reference != nullptr && put(instance, name, value, CMPI_ref);
 }
 
+bool ProviderUtilities::setNull(CMPIInstance* instance, const char* name, CMPIType type) {
+    return instance != nullptr && name != nullptr &&
+           isOk(instance->ft->setProperty(instance, name, nullptr, type));
+}
+
 bool ProviderUtilities::setProperty(const CMPIBroker* broker, CMPIInstance* instance,
                                     const char* name, const std::string& text, bool dateTime) {
     if (broker == nullptr || instance == nullptr || name == nullptr) {

@@ -172,7 +172,7 @@ TEST_F(InstanceCommands, GetTellsThatThereIsNone) {
     EXPECT_EQ(run({"get", "QVXZR_DHCPCapabilities.InstanceID=\"eth7\""}),
               (Ended{1, "",
                      "cimdhcp: CIM_ERR_NOT_FOUND: there is no "
-                     "root/cimv2:QVXZR_DHCPCapabilities.InstanceID=\"eth7\"; \"cimdhcp names "
+                     "QVXZR_DHCPCapabilities.InstanceID=\"eth7\"; \"cimdhcp names "
                      "QVXZR_DHCPCapabilities\" lists what there is\n"}));
 }
 
@@ -184,7 +184,7 @@ TEST_F(InstanceCommands, ErrorsAreInTheJsonToo) {
     "code": 6,
     "name": "CIM_ERR_NOT_FOUND"
   },
-  "returnDone": 1,
+  "returnDone": 0,
   "paths": [],
   "instances": []
 }

@@ -85,7 +85,7 @@ TEST_F(Modify, RefusesAnInstanceThatDoesNotExist) {
                    "ConfigurationName=x"}),
               (Ended{1, "",
                      "cimdhcp: CIM_ERR_NOT_FOUND: there is no "
-                     "root/cimv2:QVXZR_DHCPSettingData.InstanceID=\"Computer%eth7\"; \"cimdhcp "
+                     "QVXZR_DHCPSettingData.InstanceID=\"Computer%eth7\"; \"cimdhcp "
                      "names QVXZR_DHCPSettingData\" lists what there is\n"}));
 }
 
@@ -101,9 +101,13 @@ TEST_F(Modify, RefusesBlanksAtTheEnds) {
 }
 
 TEST_F(Modify, TellsThatNothingWasChanged) {
-    // The provider returns OK without a file, too.
+    EXPECT_EQ(run({"modify", setting, "ConfigurationName=office"}),
+              (Ended{1, "",
+                     "cimdhcp: CIM_ERR_FAILED: " + configuration("eth0") +
+                         ": No such file or directory\n"}));
+    // The exact provider returns OK without a file, too.
     EXPECT_EQ(
-        run({"modify", setting, "ConfigurationName=office"}),
+        run({"--exact", "modify", setting, "ConfigurationName=office"}),
         (Ended{1, "",
                "cimdhcp: not changed: ConfigurationName is still not set, not \"office\"\n"}));
     writeConfiguration("eth0", "CONFIG_NAME=home\n");
@@ -114,6 +118,13 @@ TEST_F(Modify, TellsThatNothingWasChanged) {
 TEST_F(Modify, TellsWhatCameOutOtherThanWanted) {
     writeConfiguration("eth0", "CONFIG_NAME=home\n");
     EXPECT_EQ(run({"modify", setting, "ConfigurationName='x'"}),
+              (Ended{1, "",
+                     "cimdhcp: CIM_ERR_FAILED: " + configuration("eth0") +
+                         " gives the name \"x\", not \"'x'\": blanks around a name and "
+                         "quotation marks do not count, and the log of the provider tells of a "
+                         "failed write\n"}));
+    writeConfiguration("eth0", "CONFIG_NAME=home\n");
+    EXPECT_EQ(run({"--exact", "modify", setting, "ConfigurationName='x'"}),
               (Ended{1, "",
                      "cimdhcp: not changed as wanted: ConfigurationName is now \"x\", not "
                      "\"'x'\"\n"}));

@@ -59,6 +59,9 @@ struct ProviderUtilities {
     static bool setProperty(CMPIInstance* instance, const char* name, unsigned long long number);
     static bool setProperty(CMPIInstance* instance, const char* name, bool truth);
     static bool setProperty(CMPIInstance* instance, const char* name, CMPIObjectPath* reference);
+    /// Sets the null of a type: some object managers show the schema's default for a property
+    /// that stays unset.
+    static bool setNull(CMPIInstance* instance, const char* name, CMPIType type);
     /// A literal would silently become a boolean.
     static bool setProperty(CMPIInstance* instance, const char* name, const char* value) = delete;
     /// With dateTime, the text is a CIM date-time of 25 characters (DSP0004, 5.2.4);
