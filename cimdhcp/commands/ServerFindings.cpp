@@ -226,8 +226,8 @@ class Examination {
         if (!served_.empty()) {
             add(Verdict::bad, "classes",
                 "are known, and none has an instance, not even QVXZR_ComputerSystem",
-                "no provider is registered for them: run provider-register.sh on that machine, "
-                "and restart SFCB");
+                "no provider is registered for them (run provider-register.sh on that machine, "
+                "and restart SFCB), or its settings name a tree that cannot be read");
         }
     }
 

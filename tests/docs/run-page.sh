@@ -112,7 +112,7 @@ mount --bind /dev "$root/dev"
 rm -rf "$root/etc/zr" "$root/var/lib/dhcp-client-provider" "$root/var/lib/sfcb"
 mount -t tmpfs none "$root/run"
 mkdir -p "$root/run/page" "$root/dhcp-client-provider"
-for component in provider neighbours schema cimdhcp; do
+for component in gateway provider neighbours schema cimdhcp; do
     DESTDIR=$root cmake --install "$build" --component "$component" --prefix /usr >/dev/null
 done
 cp "$directory"/*.* "$directory/inside" "$root/run/page"
