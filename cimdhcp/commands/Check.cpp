@@ -14,6 +14,7 @@
 #include "client/EmbeddedClient.h"
 #include "client/Response.h"
 #include "commands/DataDirectory.h"
+#include "commands/DiagnosticText.h"
 #include "commands/MachineFindings.h"
 #include "commands/PlatformSetup.h"
 #include "text/DisplayText.h"
@@ -219,31 +220,41 @@ class Examination {
         return {"", registration.nameSpaces.front(), registration.className, {}};
     }
 
+    /// Of classes that fail, or have no instance, those that do so for the same reason are one
+    /// finding.
     void lookAtClasses() {
+        std::vector<Said> failed;
+        std::vector<Said> empty;
         for (const cimom::Registration& registration : client_->registrations()) {
             if (!registration.instance || registration.nameSpaces.empty()) {
                 continue;
             }
             const Response response = client_->enumerate(pathOf(registration));
             if (!response.status.ok()) {
-                add(Verdict::bad, registration.className,
-                    std::string(cimom::statusName(response.status.code)) +
+                say(std::string(cimom::statusName(response.status.code)) +
                         (response.status.message.empty()
                              ? ""
                              : ": " + printable(response.status.message)),
-                    "every step is in the log with ZR_LOG_SINK=stderr ZR_LOG_LEVEL=3000 cimdhcp "
-                    "instances " +
-                        registration.className);
+                    registration.className, failed);
             } else if (response.instances.empty()) {
-                add(Verdict::notable, registration.className, "no instance",
-                    dhcpInterfaces_ == 0 ? "see \"machine\" above"
-                                         : "nothing of this kind is on the machine now; the log "
-                                           "tells every step with ZR_LOG_SINK=stderr "
-                                           "ZR_LOG_LEVEL=3000");
+                say("no instance", registration.className, empty);
             } else {
                 add(Verdict::good, registration.className,
                     counted(response.instances.size(), "instance", "instances"));
             }
+        }
+        for (const Said& each : failed) {
+            add(Verdict::bad, shortList(each.subjects), each.what,
+                "every step is in the log with ZR_LOG_SINK=stderr ZR_LOG_LEVEL=3000 cimdhcp "
+                "instances " +
+                    each.subjects.front());
+        }
+        for (const Said& each : empty) {
+            add(Verdict::notable, shortList(each.subjects), each.what,
+                dhcpInterfaces_ == 0 ? "see \"machine\" above"
+                                     : "nothing of this kind is on the machine now; the log "
+                                       "tells every step with ZR_LOG_SINK=stderr "
+                                       "ZR_LOG_LEVEL=3000");
         }
     }
 

@@ -101,8 +101,15 @@ const std::vector<fs::path>& sourcedDirectories() {
 void lookAtDataDirectory(const std::string& directory, std::vector<Finding>& findings,
                          const std::vector<fs::path>& sourced) {
     std::error_code error;
-    if (fs::is_directory(directory, error)) {
+    const fs::file_type type = fs::status(directory, error).type();
+    if (type == fs::file_type::directory) {
         findings.push_back(contentOf(directory));
+    } else if (error && error != std::errc::no_such_file_or_directory) {
+        const bool loop = error == std::errc::too_many_symbolic_link_levels;
+        findings.push_back(
+            {Verdict::bad, what, printable(directory) + ": " + error.message(),
+             loop ? "remove the link that leads to itself, and make a directory there"
+                  : "make it a directory that this user may look into, or set DATA_DIR"});
     } else {
         findings.push_back({Verdict::notable, dataDirectory,
                             printable(directory) +

@@ -21,10 +21,10 @@ struct Written {
     PropertyValue operator()(std::uint64_t value) const { return value; }
     PropertyValue operator()(const InterfaceName& name) const { return std::string{name.view()}; }
     PropertyValue operator()(const IpAddress& address) const { return address.text(); }
-    PropertyValue operator()(const std::vector<IpAddress>& addresses) const {
+    PropertyValue operator()(const AddressList& list) const {
         std::vector<std::string> texts;
-        texts.reserve(addresses.size());
-        for (const IpAddress& address : addresses) {
+        texts.reserve(list.addresses.size());
+        for (const IpAddress& address : list.addresses) {
             texts.push_back(address.text());
         }
         return texts;

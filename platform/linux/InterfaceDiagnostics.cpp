@@ -37,6 +37,18 @@ class Teller {
                              ", a name that no link has: whether it has this link cannot be told");
     }
 
+    /// The reason why it could not be asked, where there is one, is told once for all links.
+    void tellOfUnheard() {
+        if (decidedOn(Properties::DHCPEnabled) == PropertyValue{}) {
+            tell(Kind::Note,
+                 std::string{nameOf(*(view_.unheard ? view_.unheard : view_.unheard6))} +
+                     " does not respond: whether it uses DHCP here cannot be told");
+        } else if (decidedOn(Properties::AddressSource) == PropertyValue{}) {
+            tell(Kind::Note, std::string{nameOf(*view_.unheard6)} +
+                                 " does not respond: whether it has a lease cannot be told");
+        }
+    }
+
     /// Where all clients are seen.
     void tellOfClientsThatAreMissing() {
         if (decidedOn(Properties::DHCPEnabled) == PropertyValue{false}) {
@@ -131,6 +143,8 @@ void addDiagnostics(const Machine& machine, const InterfaceView& view,
         teller.tellOfPort();
     } else if (view.strayed != nullptr) {
         teller.tellOfStrayed(*view.strayed);
+    } else if (view.unheard || view.unheard6) {
+        teller.tellOfUnheard();
     } else if (!view.hidden) {
         teller.tellOfClientsThatAreMissing();
     }

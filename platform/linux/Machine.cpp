@@ -35,6 +35,14 @@ bool contains(const std::vector<std::uint32_t>& indexes, std::uint32_t ifindex) 
     return std::find(indexes.begin(), indexes.end(), ifindex) != indexes.end();
 }
 
+/// Whether a configuration that names its link by hardware address means this one. A link
+/// that lies upon another has the other's address.
+bool means(const LinkConfiguration& configuration, const Link& link) {
+    return configuration.hardwareAddress == link.hardwareAddress &&
+           (link.kind.empty() || link.kind == "veth") && (link.flags & IFF_LOWER_UP) == 0 &&
+           configuration.names.take(link.name);
+}
+
 /// Whether a client was told to run on named links and is known by those that it hears:
 /// the names may be old.
 bool isKnownByIndex(const ClientProcess& process) {
@@ -59,6 +67,8 @@ class ClaimedLinks {
             }
             if (management.ifindex != 0) {
                 indexes_.insert(management.ifindex);
+            } else if (!management.hardwareAddress.empty()) {
+                withoutCables_.push_back(&management);
             } else if (management.interfaceName) {
                 names_.insert(*management.interfaceName);
             }
@@ -67,13 +77,25 @@ class ClaimedLinks {
 
     [[nodiscard]] bool contain(const Link& link) const {
         return (link.flags & IFF_LOOPBACK) == 0 &&
-               (indexes_.contains(link.ifindex) || names_.contains(link.name));
+               (indexes_.contains(link.ifindex) || names_.contains(link.name) ||
+                std::any_of(withoutCables_.begin(), withoutCables_.end(),
+                            [&](const LinkConfiguration* each) { return means(*each, link); }));
     }
 
   private:
     std::set<std::uint32_t> indexes_;
     std::set<InterfaceName> names_;
+    std::vector<const LinkConfiguration*> withoutCables_;
 };
+
+/// Whether an address looks as one that DHCPv6 gave, or a router announced, and no lease is
+/// known of it.
+bool mayBeLeased6(const Address& address, const InterfaceView& view) {
+    return !address.ip.isIPv4() && address.scope == RT_SCOPE_UNIVERSE &&
+           address.validLifetime != Address::infinite &&
+           std::none_of(view.leases6.begin(), view.leases6.end(),
+                        [&](const Lease* lease) { return lease->address == address.ip; });
+}
 
 bool holdsLease(const ClientProcess& process, const InterfaceView& view) {
     const auto& leases = process.ipv6 ? view.leases6 : view.leases;
@@ -132,6 +154,7 @@ Machine::Machine(MachineFacts facts, std::int64_t now) : facts_(std::move(facts)
     collectManagements();
     collectProcesses();
     collectHidden();
+    collectUnheard();
     collectSockets();
     collectBootLease();
     findNextChange();
@@ -286,6 +309,35 @@ void Machine::collectHidden() {
     }
 }
 
+/// A manager may have taken a link since it wrote of it, and connman names no links.
+void Machine::collectUnheard() {
+    const ClientFacts& clients = facts_.clients;
+    for (const Client manager : clients.unheardManagers) {
+        for (InterfaceView& view : views_) {
+            const Link& link = *view.link;
+            const auto said = std::find_if(
+                view.managements.begin(), view.managements.end(),
+                [&](const LinkConfiguration* each) { return each->client == manager; });
+            const bool known = said != view.managements.end();
+            // networkd writes of each link that it takes before it does anything to it.
+            const bool leftAlone = (link.flags & IFF_BROADCAST) == 0 || view.enslaved ||
+                                   contains(clients.unmanagedLinks, link.ifindex) ||
+                                   (manager == Client::Networkd && !known);
+            if (leftAlone) {
+                continue;
+            }
+            if (!known || !(*said)->dhcp4) {
+                view.unheard = manager;
+                view.hidden = true;
+            }
+            if (std::any_of(view.addresses.begin(), view.addresses.end(),
+                            [&](const Address& each) { return mayBeLeased6(each, view); })) {
+                view.unheard6 = manager;
+            }
+        }
+    }
+}
+
 void Machine::collectSockets() {
     // A socket of all links tells of one link only together with another one that hears
     // it, and then no more than the process would, where that can be seen.
@@ -361,6 +413,12 @@ InterfaceView* Machine::find(const InterfaceName& name) {
 InterfaceView* Machine::find(const LinkConfiguration& configuration) {
     if (configuration.ifindex != 0) {
         return find(configuration.ifindex);
+    }
+    if (!configuration.hardwareAddress.empty()) {
+        const auto found = std::find_if(
+            views_.begin(), views_.end(),
+            [&](const InterfaceView& view) { return means(configuration, *view.link); });
+        return found == views_.end() ? nullptr : &*found;
     }
     return configuration.interfaceName ? find(*configuration.interfaceName) : nullptr;
 }

@@ -44,7 +44,12 @@ struct InterfaceView {
     /// or not where they run, or one was started under a name that no link has any more.
     bool hidden = false;
     const ClientProcess* strayed = nullptr;  ///< the latter; it may have any such link
-    const Address* address = nullptr;        ///< the one that was decided on
+    /// A manager that could not be asked, where it may use DHCP on the link without its files
+    /// telling so.
+    std::optional<Client> unheard{};
+    /// Likewise, where an address of IPv6 may be one that DHCPv6 gave it.
+    std::optional<Client> unheard6{};
+    const Address* address = nullptr;  ///< the one that was decided on
 
     /// The first program that runs and takes an address of the link by DHCP of this family;
     /// null for none.
@@ -121,6 +126,7 @@ class Machine {
     void addProcess(const ClientProcess& process, InterfaceView& view) const;
     const ClientProcess* findStrayed();
     void collectHidden();
+    void collectUnheard();
     void collectSockets();
     void collectBootLease();
     void findNextChange();

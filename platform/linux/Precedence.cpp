@@ -139,7 +139,7 @@ Found servers(const InterfaceView& view) {
             hear(*lease);
         }
     }
-    return first == nullptr ? Found{} : from(*first, std::move(found));
+    return first == nullptr ? Found{} : from(*first, AddressList{std::move(found)});
 }
 
 constexpr std::array rows{
@@ -220,7 +220,7 @@ constexpr std::array rows{
     DecisionRow{Properties::DHCPEnabled, "the link's manager does not use DHCP",
                 [](const InterfaceView& view) -> Found {
                     for (const LinkConfiguration* management : view.managements) {
-                        if (!view.hidden && hasDhcp(*management)) {
+                        if (!view.hidden && !view.unheard6 && hasDhcp(*management)) {
                             return from(*management, false);
                         }
                     }
@@ -228,7 +228,8 @@ constexpr std::array rows{
                 }},
     DecisionRow{Properties::DHCPEnabled, "no client has the link, and no address of it is leased",
                 [](const InterfaceView& view) -> Found {
-                    return view.hidden || firstIPv4(view, hasEnd) ? Found{} : kernel(false);
+                    return view.hidden || view.unheard6 || firstIPv4(view, hasEnd) ? Found{}
+                                                                                   : kernel(false);
                 }},
 
     DecisionRow{Properties::AddressSource, "the master owns the addresses of its ports",
@@ -320,24 +321,23 @@ constexpr std::array rows{
                                : from(*view.leases6.front(), source(AddressSource::DHCP));
                 }},
     DecisionRow{Properties::AddressSource, "no address",
-                [](const InterfaceView& /*view*/) -> Found {
-                    return kernel(source(AddressSource::Unknown));
+                [](const InterfaceView& view) -> Found {
+                    return view.unheard6 ? Found{} : kernel(source(AddressSource::Unknown));
                 }},
 
     DecisionRow{Properties::DHCPServerAddresses, "the master owns the addresses of its ports",
                 [](const InterfaceView& view) {
-                    return view.enslaved ? Found{kernel(std::vector<IpAddress>{})} : Found{};
+                    return view.enslaved ? Found{kernel(AddressList{})} : Found{};
                 }},
     DecisionRow{Properties::DHCPServerAddresses, "the servers of the live leases", servers},
     DecisionRow{Properties::DHCPServerAddresses, "the one that the link's DHCP client talks to",
                 [](const InterfaceView& view) {
                     return view.socket != nullptr && view.socket->peer
-                               ? Found{fromSocket(std::vector{*view.socket->peer})}
+                               ? Found{fromSocket(AddressList{{*view.socket->peer}})}
                                : Found{};
                 }},
-    DecisionRow{
-        Properties::DHCPServerAddresses, "no client tells of a server",
-        [](const InterfaceView& /*view*/) -> Found { return kernel(std::vector<IpAddress>{}); }},
+    DecisionRow{Properties::DHCPServerAddresses, "no client tells of a server",
+                [](const InterfaceView& /*view*/) -> Found { return kernel(AddressList{}); }},
 };
 
 }  // namespace

@@ -24,9 +24,16 @@ struct Origin {
     bool operator==(const Origin&) const = default;
 };
 
+/// A list of addresses as a value. A type of its own, for the reason that NumberList has
+/// (Snapshot.h).
+struct AddressList {
+    std::vector<IpAddress> addresses;
+
+    bool operator==(const AddressList&) const = default;
+};
+
 /// What the value of a property may be made of. The tree has texts of names and addresses.
-using FoundValue =
-    std::variant<bool, std::uint64_t, InterfaceName, IpAddress, std::vector<IpAddress>>;
+using FoundValue = std::variant<bool, std::uint64_t, InterfaceName, IpAddress, AddressList>;
 
 /// A value, and what it was taken from.
 struct Finding {

@@ -34,7 +34,9 @@ constexpr std::array networkManagerPlaces{
     StatePlace{networkManagerProfiles[2], ""}};
 constexpr std::array wickedPlaces{StatePlace{wickedDirectories[0], wickedLeasePrefix},
                                   StatePlace{wickedDirectories[1], wickedLeasePrefix}};
-constexpr std::array connmanPlaces{StatePlace{connmanDirectory, ""}};
+constexpr std::array connmanPlaces{
+    StatePlace{connmanDirectory, ""},
+    StatePlace{connmanConfigurationDirectory, connmanConfigurationFile}};
 constexpr std::array dhclientPlaces{StatePlace{dhclientDirectories[0].path, dhclientNamePrefix},
                                     StatePlace{dhclientDirectories[1].path, dhclientNamePrefix},
                                     StatePlace{dhclientDirectories[2].path, dhclientNamePrefix},

@@ -24,12 +24,15 @@ source "$here/dhcp-truth.sh"
 processes=()          # the names of its processes
 client_name=          # how the program calls it
 tells_server=yes      # whether anything tells the server
-gives_up=no           # whether it soon takes an address of its own where no server is
+gives_up=no           # whether it soon takes an address of its own where no server is; then
+                      # it has misses_cable, which tells whether it knows that the cable is out
+source_of_none=0      # AddressSource where no server is, after some time
 address_stays=no      # whether its address stays when it is killed and the lease ends
 without_cable=true    # DHCPEnabled when the cable is out and the address gone
 file_found=yes        # whether its lease file is found when it does not run
 drops_address=yes     # whether it takes its address away when the cable is out
 loses_name=no         # whether nothing ties it to its link then
+asked_on_bus=()       # the names of its processes that respond on the system bus
 follows_name=yes      # whether it goes on when its link gets another name
 source "$clients/$kind.sh"
 
@@ -49,7 +52,7 @@ await_lease() {
 # Takes the cable out and puts it in again, at which a client that has given up asks.
 replug() {
     ip -n "$server" link set zrs$$ down
-    sleep 1
+    eventually misses_cable || { explain; fail "$kind does not miss the cable"; }
     ip -n "$server" link set zrs$$ up
 }
 explain() {
@@ -94,12 +97,31 @@ life() {
     start_client || { explain; fail "$kind does not start"; }
     eventually is_running "${processes[@]}"
     asking "no server"
+    if ((${#asked_on_bus[@]} != 0)); then
+        suspend_processes "${asked_on_bus[@]}"
+        truth_now "no server, and it does not respond" enabled='@(true|unknown)' \
+            source="$source_of_none" servers=none
+        tells "no server, and it does not respond" 'cannot be asked'
+        resume_processes "${asked_on_bus[@]}"
+        truth "no server, and it responds again" enabled=true source="$source_of_none" servers=none
+    fi
 
     start_server
     [[ $gives_up == no ]] || replug
     await_lease
     first=$(kernel_address)
     bound "a lease" 198.51.100.1
+    if ((${#asked_on_bus[@]} != 0)); then
+        suspend_processes "${asked_on_bus[@]}"
+        truth_now "a lease, and it does not respond" enabled=true source=1
+        resume_processes "${asked_on_bus[@]}"
+        bound "a lease, and it responds again" 198.51.100.1
+    fi
+    if declare -F kill_link >/dev/null; then
+        kill_link || { explain; fail "$kind does not understand"; }
+        await_lease "after it was told to leave the link"
+        bound "told to leave the link" 198.51.100.1
+    fi
 
     ip -n "$server" link set zrs$$ down
     if [[ $drops_address == no ]]; then
@@ -204,7 +226,9 @@ end() {
     [[ $address_stays == no ]] || facts=(link=yes)
     [[ $file_found == yes ]] || facts=(enabled=unknown source=0)
     truth "killed while the lease runs" "${facts[@]}"
-    sleep $((ended - SECONDS + 1))
+    while ((SECONDS <= ended)); do
+        sleep 0.2
+    done
     if no_address "$current"; then
         nothing "killed, and the lease has ended"
     else

@@ -28,6 +28,9 @@ work=$(mktemp -d)
 holder=
 
 cleanup() {
+    local status=$?
+    # Where a command of the test failed that was not expected to.
+    ((status == 0)) || [[ -e $work/failed ]] || fail_after_all "status $status ${moment:+after \"$moment\"}"
     # Whatever the two machines still run, by its number: it is all the test's own.
     local pid
     for pid in $(ip netns pids "$client" 2>/dev/null) $(ip netns pids "$server" 2>/dev/null); do
@@ -40,10 +43,18 @@ cleanup() {
 trap cleanup EXIT
 trap 'exit 1' INT TERM HUP
 
+# fail TEXT...: ends the test. What was false before stands in the last lines, once more: of
+# a long output these are what is looked at.
 fail() {
-    echo "FAILED: $*"
+    fail_after_all "$@"
     exit 1
 }
+fail_after_all() {
+    : >"$work/failed"
+    [[ ! -e $work/falsehoods ]] || cat "$work/falsehoods"
+    echo "FAILED: $*"
+}
+moment=  # the last one that was looked at
 
 # expect TEXT COMMAND...: the command's output has the text.
 expect() {
@@ -211,13 +222,41 @@ is_running() {
 not_running() {
     ! is_running "$@"
 }
-# kill_processes SIGNAL NAME...: and waits for their ends.
+# The programs that clients start for what they were told: one may live on and set an
+# address that its client got.
+hooks=(dhclient-script dhcpcd-run-hook nm-dhcp-helper udhcpc-script default.script)
+# kill_processes SIGNAL NAME...: them, their hooks, and what they start meanwhile; waits until
+# none has been there for some moments.
 kill_processes() {
-    local signal=$1
+    local signal=$1 attempt pid pids none=0
+    local -A told=()
     shift
+    for ((attempt = 0; attempt < 300; ++attempt)); do
+        pids=$(pids_of "$@" "${hooks[@]}")
+        if [[ -z $pids ]]; then
+            ((++none < 3)) || return 0
+        else
+            none=0
+        fi
+        for pid in $pids; do
+            # Once: a second signal may cut an orderly end short.
+            [[ -n ${told[$pid]:-} ]] || kill -s "$signal" "$pid" 2>/dev/null || true
+            told[$pid]=yes
+        done
+        sleep 0.1
+    done
+    echo "still there: $*"
+    return 1
+}
+# suspend_processes NAME..., resume_processes NAME...: what is suspended runs and responds to
+# nothing.
+suspend_processes() {
     # shellcheck disable=SC2046 # numbers
-    kill -s "$signal" $(pids_of "$@") 2>/dev/null || true
-    eventually not_running "$@"
+    kill -s STOP $(pids_of "$@")
+}
+resume_processes() {
+    # shellcheck disable=SC2046 # numbers
+    kill -s CONT $(pids_of "$@")
 }
 no_address() {
     [[ -z $(kernel_address "$1") ]]

@@ -223,32 +223,32 @@ clock() {
 # at_clock OFFSET MOMENT FACT=PATTERN...: what the program tells with such a clock. Times
 # of files stay what they are.
 at_clock() {
-    local offset=$1 moment=$2
+    local offset=$1
+    moment=$2
     shift 2
     ((++truths))
     in_client env ZR_LOG_SINK=none NO_FAKE_STAT=1 faketime -f "$offset" "$program" tree >"$work/fresh.json"
     # When the kernel will remove the address is known by the true clock alone.
     false_in "$work/fresh.json" "address=$(kernel_address)" "$@" | grep -v LeaseExpires >"$work/false" || true
-    judge "$moment"
+    judge
 }
 judge() {
     if [[ -s $work/false ]]; then
-        ((++falsehoods))
-        sed "s/^/FALSE: $subject, $1: /" "$work/false"
+        tell_falsehoods
     else
-        echo "right: $subject, $1"
+        echo "right: $subject, $moment"
     fi
 }
 
 # What a user without rights cannot know is told to be unknown, and why.
 seen_by_nobody() { # seen_by_nobody MOMENT FACT=PATTERN...
-    local moment=$1
+    moment=$1
     shift
     ((++truths))
     in_client "${as_nobody[@]}" env ZR_LOG_SINK=none ZR_DATA_DIR="$work/data" \
         "$work/program/bin/cimdhcp" tree >"$work/fresh.json" 2>>"$work/client.log" || true
     false_in "$work/fresh.json" "$@" "address=$(kernel_address)" >"$work/false"
-    judge "$moment"
+    judge
     if [[ " $* " == *" enabled=unknown "* ]]; then
         ((++truths))
         in_client "${as_nobody[@]}" env ZR_LOG_SINK=none ZR_DATA_DIR="$work/data" \
@@ -256,8 +256,7 @@ seen_by_nobody() { # seen_by_nobody MOMENT FACT=PATTERN...
         if [[ -s $work/told ]]; then
             echo "right: $subject, $moment, is told"
         else
-            ((++falsehoods))
-            echo "FALSE: $subject, $moment: nothing is told"
+            tell_false "$moment: nothing is told"
         fi
     fi
 }

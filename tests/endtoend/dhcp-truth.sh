@@ -16,6 +16,8 @@
 #     InterfaceState, IPv4Address and the end of a lease that the kernel knows, too, are
 #     compared with the kernel each time, a server never stands where there is no
 #     endpoint, and no source where there is no address.
+#   truth_now MOMENT FACT=PATTERN...  the same, of a program started for the one question alone:
+#       one that stays may know more
 #   tells MOMENT REGEX              a line of "cimdhcp show" on standard error has it
 #   finish                          tells how many were false; the status is 1 if any was
 # A moment that is false does not end the test.
@@ -112,13 +114,16 @@ false_in() {
     fi
 }
 
-# instances CLASS PROPERTY NAME OPTION...: the property of those that are named, one per line.
+# instances CLASS PROPERTIES NAMES OPTION...: these properties of those that are named so, one
+# per line; both are words in one text.
 instances() {
-    local class=$1 property=$2 name=$3
+    local class=$1 properties=$2 names=$3
     shift 3
-    cimdhcp "$@" --format json instances "$class" 2>/dev/null |
-        jq -c --arg property "$property" --arg name "$name" '.instances[].properties
-            | select((.Name // .ElementName).value == $name) | .[$property].value | values'
+    cimdhcp "$@" --format json instances "$class" 2>>"$work/classes.log" |
+        jq -c --arg properties "$properties" --arg names "$names" '($names | split(" ")) as $named
+            | .instances[].properties
+            | select((.Name // .ElementName).value as $name | $named | index([$name]))
+            | .[$properties | split(" ")[]].value | values'
 }
 # false_classes FILE OPTION...: as false_in, of the classes against the tree in the file.
 false_classes() {
@@ -135,28 +140,31 @@ false_classes() {
         11) expected='2 8' ;;
         *) expected='3 0' ;;
     esac
-    value=$(instances QVXZR_DHCPProtocolEndpoint EnabledState "$current" "$@"
-        instances QVXZR_DHCPProtocolEndpoint ClientState "$current" "$@")
+    value=$(instances QVXZR_DHCPProtocolEndpoint 'EnabledState ClientState' "$current" "$@")
     value=${value//$'\n'/ }
     [[ $value == "$expected" ]] || echo "endpoint: true is '$expected', shown '$value'"
-    servers=$({
-        instances QVXZR_DHCPRemoteServiceAccessPoint AccessInfo "${current}_IPv4" "$@"
-        instances QVXZR_DHCPRemoteServiceAccessPoint AccessInfo "${current}_IPv6" "$@"
-    } | jq -rs 'join(",")')
+    servers=$(instances QVXZR_DHCPRemoteServiceAccessPoint AccessInfo \
+        "${current}_IPv4 ${current}_IPv6" "$@" | jq -rs 'join(",")')
     [[ ${servers:-none} == "${seen[servers]}" ]] || echo "access points: true is ${seen[servers]}, shown $servers"
     value=$(instances QVXZR_DHCPSettingData RequestedIPv4Address "$current" "$@" | jq -r .)
     [[ ${value:-none} == "${seen[address]}" || ${seen[enabled]} != true ]] ||
         echo "setting data: true is ${seen[address]}, shown ${value:-none}"
 }
 
-# compare FACT=PATTERN...: what is false now goes to $work/false; the status is 1 if anything is.
-compare() {
+# kernel_facts: what the kernel tells of the current interface, as FACT=PATTERN in lines.
+kernel_facts() {
     local address state=0 operstate
     address=$(kernel_address "$current" 2>/dev/null) || true
     operstate=$(ip -n "$client" -j link show dev "$current" 2>/dev/null | jq -r '.[0].operstate')
     [[ $operstate != @(UP|UNKNOWN) ]] || state=1
-    local -a facts=("$@")
-    [[ " $*" == *" link=no"* ]] || facts+=("address=${address:-none}" "state=$state")
+    printf '%s\n' "address=${address:-none}" "state=$state"
+}
+# compare FACT=PATTERN...: what is false now goes to $work/false; the status is 1 if anything is.
+compare() {
+    local -a facts=("$@") kernel=()
+    mapfile -t kernel < <(kernel_facts)
+    : >"$work/classes.log"
+    [[ " $*" == *" link=no"* ]] || facts+=("${kernel[@]}")
     {
         cimdhcp tree >"$work/fresh.json" 2>"$work/fresh.log" || echo "started now: no tree"
         staying_tree >"$work/staying.json" || echo "stays: no tree"
@@ -171,26 +179,64 @@ compare() {
     [[ ! -s $work/false ]]
 }
 
+compare_now() {
+    local -a kernel=()
+    mapfile -t kernel < <(kernel_facts)
+    {
+        cimdhcp tree >"$work/fresh.json" 2>"$work/fresh.log" || echo "no tree"
+        false_in "$work/fresh.json" "$@" "${kernel[@]}"
+    } >"$work/false"
+    [[ ! -s $work/false ]]
+}
+
 # A client changes the kernel, its files and its own mind one after the other: some seconds
 # are left for the last of them.
 truth() {
-    local moment=$1 deadline=$((SECONDS + ${TRUTH_PATIENCE:-5}))
-    shift
     [[ -n $asked ]] || start_staying
+    await_truth compare "$@"
+}
+truth_now() {
+    await_truth compare_now "$@"
+}
+# await_truth COMPARISON MOMENT FACT=PATTERN...: a slow machine, on which one comparison takes
+# seconds, makes as many as a fast one. Those in which a manager had no time to respond do not
+# count, for a minute.
+await_truth() {
+    local comparison=$1 deadline=$((SECONDS + ${TRUTH_PATIENCE:-5})) attempts=0
+    local last=$((SECONDS + 60))
+    moment=$2
+    shift 2
     ((++truths))
-    until compare "$@"; do
-        if ((SECONDS > deadline)); then
-            is_false "$moment"
+    until "$comparison" "$@"; do
+        if ((SECONDS > last)) || ! is_unheard; then
+            ((++attempts))
+        fi
+        if ((SECONDS > deadline && attempts >= 8)); then
+            is_false
             return 0
         fi
         sleep 0.2
     done
     echo "right: $subject, $moment ($SECONDS s)"
 }
-is_false() {
-    local moment=$1
+# Whether a process told in the last comparison that it could not ask a manager, or, if it
+# stays, that it does not know what such a one would tell.
+is_unheard() {
+    grep -qs 'cannot be asked' "$work/fresh.log" "$work/classes.log" ||
+        grep -q '^stays: .*, shown unknown$' "$work/false"
+}
+# tell_false TEXT: tells now, and at the end once more.
+tell_false() {
     ((++falsehoods))
-    sed "s/^/FALSE: $subject, $moment: /" "$work/false"
+    echo "FALSE: $subject, $1" | tee -a "$work/falsehoods"
+}
+# tell_falsehoods: each line of $work/false, of the present moment.
+tell_falsehoods() {
+    ((++falsehoods))
+    sed "s/^/FALSE: $subject, $moment: /" "$work/false" | tee -a "$work/falsehoods"
+}
+is_false() {
+    tell_falsehoods
     {
         echo "--- $subject, $moment: the kernel:"; ip -n "$client" address show
         echo "--- the program:"; cimdhcp tree --explain
@@ -200,14 +246,14 @@ is_false() {
 }
 
 tells() {
-    local moment=$1 regex=$2 told
+    local regex=$2 told
+    moment=$1
     ((++truths))
     told=$(cimdhcp show 2>&1 >/dev/null) || true
     if grep -Eq "$regex" <<<"$told"; then
         echo "right: $subject, $moment, is told"
     else
-        ((++falsehoods))
-        echo "FALSE: $subject, $moment: not told is /$regex/; told is: ${told:-nothing}"
+        tell_false "$moment: not told is /$regex/; told is: ${told:-nothing}"
     fi
 }
 

@@ -2,16 +2,20 @@
 # What happens to a DHCPv6 client, and no DHCPv4 at all: after each event, what the program
 # shows is compared with what the kernel says.
 #
-# Usage: dhcp6-clients.sh PATH-OF-cimdhcp PATH-OF-tree-on-request CLIENT
-# CLIENT: dhcp6c, dhclient, dhcpcd, networkd or NetworkManager
+# Usage: dhcp6-clients.sh PATH-OF-cimdhcp PATH-OF-tree-on-request CLIENT EVENTS
+# CLIENT: dhcp6c, dhclient, dhcpcd, networkd or NetworkManager; EVENTS: life (leases of ten
+# minutes) or end (of twenty seconds, which end)
 set -euo pipefail
 
 program=$1
 tree_on_request=$2
 kind=$3
+events=$4
 subject="$kind, DHCPv6"
-source "$(dirname "$0")/dhcp-laboratory.sh"
-source "$(dirname "$0")/dhcp-truth.sh"
+here=$(dirname "$0")
+source "$here/dhcp-laboratory.sh"
+source "$here/dhcp-truth.sh"
+need python3
 
 in_server ip address add 2001:db8:99::1/64 dev zrs$$ nodad
 start_server6() {
@@ -19,6 +23,8 @@ start_server6() {
 }
 # A manager has the link in its hands when it asks.
 managed=no
+# Whether its address stays when it is killed and the lease ends.
+address_stays=no
 # Whether a file or a bus tells of the lease.
 tells_lease=yes
 
@@ -28,6 +34,7 @@ case $kind in
         processes=(dhcp6c)
         client_name=dhcp6c
         tells_lease=no
+        address_stays=yes
         in_client mkdir -p /var/lib/dhcpv6
         write_in_client /run/dhcp6c.conf <<'FILE'
 interface eth1 {
@@ -115,7 +122,7 @@ not_leased6() {
 explain() {
     echo "--- the kernel:"; ip -n "$client" address show dev eth1
     echo "--- the client:"; tail -20 "$work/client.log"
-    echo "--- the server:"; tail -20 "$work/dnsmasq.log"
+    echo "--- the server:"; tail -20 "$work"/{dnsmasq,short-server}.log 2>/dev/null || true
 }
 # A link has no address for DHCPv6 to be asked from before its own is known to be unique.
 link_local() {
@@ -135,33 +142,91 @@ bound6() {
     fi
 }
 
-eventually link_local || { explain; fail "no address of the link"; }
-nothing6 "before it runs"
-start_client || { explain; fail "$kind does not start"; }
-eventually is_running "${processes[@]}"
-# Without a router, a manager may have nothing to ask for.
-[[ $managed == yes ]] ||
+life() {
+    eventually link_local || { explain; fail "no address of the link"; }
+    nothing6 "before it runs"
+    start_client || { explain; fail "$kind does not start"; }
+    eventually is_running "${processes[@]}"
+    # Managers are told to ask without a router, too.
     truth "no server" enabled=true source=0 servers=none lease4=none lease6="$client_name [023467] - -"
 
-start_server6
-eventually leased6 || { explain; fail "$kind gets no lease"; }
-bound6 "a lease"
+    start_server6
+    eventually leased6 || { explain; fail "$kind gets no lease"; }
+    bound6 "a lease"
+    if [[ $managed == yes ]]; then
+        # Its files do not tell what DHCPv6 gave.
+        suspend_processes "${processes[@]}"
+        truth_now "a lease, and it does not respond" enabled='@(true|unknown)' source='@(1|none)'
+        tells "a lease, and it does not respond" 'cannot be asked'
+        resume_processes "${processes[@]}"
+        bound6 "a lease, and it responds again"
+    fi
 
-ip -n "$client" -6 address flush dev eth1 scope global
-sleep 0.3
-leased6 || truth "the address flushed" enabled=true source=0 servers=none lease4=none
-
-stop_client || { explain; fail "$kind does not give the lease back"; }
-eventually not_leased6 || { explain; fail "$kind keeps the address"; }
-nothing6 "released"
-
-start_client || { explain; fail "$kind does not start again"; }
-eventually leased6 || { explain; fail "$kind gets no lease again"; }
-bound6 "a lease again"
-kill_processes KILL "${processes[@]}"
-truth "killed while the lease runs" link=yes lease4=none
-# As the kernel does when the lease ends.
-ip -n "$client" -6 address delete "$(leased_address6)/128" dev eth1 2>/dev/null ||
     ip -n "$client" -6 address flush dev eth1 scope global
-nothing6 "killed, and no address"
+    sleep 0.3
+    leased6 || truth "the address flushed" enabled=true source=0 servers=none lease4=none
+
+    stop_client || { explain; fail "$kind does not give the lease back"; }
+    eventually not_leased6 || { explain; fail "$kind keeps the address"; }
+    nothing6 "released"
+
+    start_client || { explain; fail "$kind does not start again"; }
+    eventually leased6 || { explain; fail "$kind gets no lease again"; }
+    bound6 "a lease again"
+    kill_processes KILL "${processes[@]}"
+    truth "killed while the lease runs" link=yes lease4=none
+    # As the kernel does when the lease ends.
+    ip -n "$client" -6 address delete "$(leased_address6)/128" dev eth1 2>/dev/null ||
+        ip -n "$client" -6 address flush dev eth1 scope global
+    nothing6 "killed, and no address"
+}
+
+# Leases that soon end, and no server that renews them.
+start_short_server6() {
+    in_server python3 "$here/dhcp6-short-server.py" zrs$$ 2001:db8:99::155 20 \
+        >"$work/short-server.log" 2>&1 &
+    disown  # its end is no news
+    eventually short_server6_runs || { cat "$work/short-server.log"; fail "no server"; }
+}
+short_server6_runs() {
+    [[ -n $(in_server ss -6 -H -l -u -n 'sport = :547') ]]
+}
+stop_short_server6() {
+    local pid
+    for pid in $(ip netns pids "$server"); do
+        [[ $(<"/proc/$pid/comm") != python* ]] || kill "$pid"
+    done
+}
+end() {
+    eventually link_local || { explain; fail "no address of the link"; }
+    start_short_server6
+    start_client || { explain; fail "$kind does not start"; }
+    eventually leased6 || { explain; fail "$kind gets no lease"; }
+    bound6 "a lease of twenty seconds"
+    stop_short_server6
+    eventually not_leased6 || { explain; fail "$kind keeps the address"; }
+    truth "no server until the end of the lease" enabled=true source=0 servers=none lease4=none \
+        lease6="$client_name [023467] - -"
+
+    start_short_server6
+    eventually leased6 || { explain; fail "$kind gets no lease after the end of another"; }
+    bound6 "a lease after the end of another"
+    kill_processes KILL "${processes[@]}"
+    stop_short_server6
+    if [[ $address_stays == yes ]]; then
+        truth "killed, and its address stays" enabled=false source=0 servers=none lease6=none
+        return 0
+    fi
+    # The kernel ends the address.
+    eventually not_leased6 || { explain; fail "the address of $kind has no end"; }
+    nothing6 "killed, and the lease has ended"
+}
+
+case $events in
+    life | end) "$events" ;;
+    *)
+        echo "no such events: $events"
+        exit 2
+        ;;
+esac
 finish

@@ -8,8 +8,11 @@
 namespace ZR::Live {
 namespace {
 
-constexpr std::chrono::milliseconds timeToRespond{60};
-constexpr std::chrono::seconds pause{30};
+// A busy machine needs some of it for a manager that is well; a request waits for one that is
+// not, and its snapshot then lacks what the manager knows.
+constexpr std::chrono::milliseconds timeToRespond{250};
+constexpr std::chrono::seconds firstPause{1};
+constexpr std::chrono::seconds longestPause{30};
 
 std::string_view addNetworkd(std::string_view json, ClientFacts& facts) {
     const auto parsed = parseNetworkdDescription(json);
@@ -37,23 +40,41 @@ ManagerBuses::ManagerBuses(Ways ways)
            {Client::NetworkManager, std::move(ways.networkManager), addNetworkManagerDescription},
            {Client::Connman, std::move(ways.connman), addConnmanServices}}} {}
 
+/// Adds what it says; false when it says nothing that can be used.
+bool ManagerBuses::hear(const Manager& manager, std::string_view json, ClientFacts& facts) {
+    if (json.empty()) {
+        return false;
+    }
+    const std::string_view reason = manager.add(json, facts);
+    if (!reason.empty()) {
+        facts.diagnostics.emplace_back("cannot use what " + std::string{nameOf(manager.client)} +
+                                           " says: " + std::string{reason},
+                                       Diagnostic::Kind::Damaged);
+    }
+    return reason.empty();
+}
+
 void ManagerBuses::consult(ClientFacts& facts, Time now) {
     for (Manager& manager : managers_) {
-        if (!manager.ask || now < manager.rest || !isToBeAsked(facts, manager.client)) {
+        if (!manager.ask || !isToBeAsked(facts, manager.client)) {
             continue;
         }
-        const BusResponse response = manager.ask(std::chrono::steady_clock::now() + timeToRespond);
-        if (!response.reason.empty()) {
-            facts.diagnostics.emplace_back(response.reason);
-            manager.rest = now + pause;
-        } else if (!response.json.empty()) {
-            const std::string_view reason = manager.add(response.json, facts);
-            if (!reason.empty()) {
-                facts.diagnostics.emplace_back("cannot use what " +
-                                                   std::string{nameOf(manager.client)} +
-                                                   " says: " + std::string{reason},
-                                               Diagnostic::Kind::Damaged);
+        if (now >= manager.rest) {
+            BusResponse response = manager.ask(std::chrono::steady_clock::now() + timeToRespond);
+            manager.reason = std::move(response.reason);
+            if (manager.reason.empty()) {
+                manager.pause = {};
+                if (hear(manager, response.json, facts)) {
+                    continue;
+                }
+            } else {
+                manager.pause = std::clamp(2 * manager.pause, firstPause, longestPause);
+                manager.rest = now + manager.pause;
             }
+        }
+        facts.unheardManagers.push_back(manager.client);
+        if (!manager.reason.empty()) {
+            facts.diagnostics.emplace_back(manager.reason);
         }
     }
 }

@@ -3,6 +3,8 @@
 #include <array>
 #include <chrono>
 #include <functional>
+#include <string>
+#include <string_view>
 
 #include "clients/BusRequest.h"
 #include "clients/ConnmanBus.h"
@@ -14,7 +16,9 @@ namespace ZR::Live {
 
 /// Asks those managers over the system bus that run and can be asked there: they know more
 /// than their files tell. One that does not respond in time is left alone for a while, as
-/// each request to it would make a reading wait. One thread.
+/// each request to it would make a reading wait: for a second, and twice as long each time
+/// up to half a minute. Until it responds, each reading has it among the unheard managers,
+/// and the reason among its diagnostics. One thread.
 class ManagerBuses {
   public:
     using Time = std::chrono::steady_clock::time_point;
@@ -39,8 +43,13 @@ class ManagerBuses {
         Ask ask;
         /// Returns why the text cannot be used, empty when it can.
         std::string_view (*add)(std::string_view json, ClientFacts& facts) = nullptr;
-        Time rest{};  ///< not to be asked before
+        Time rest{};                   ///< not to be asked before
+        std::chrono::seconds pause{};  ///< the last one; 0 when it responded
+        std::string reason{};          ///< why it did not respond
     };
+
+    [[nodiscard]] static bool hear(const Manager& manager, std::string_view json,
+                                   ClientFacts& facts);
 
     std::array<Manager, 3> managers_;
 };

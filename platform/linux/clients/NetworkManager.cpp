@@ -128,6 +128,8 @@ void readDevices(const Roots& roots, const std::vector<ProfileFile>& profiles, C
         const NetworkManagerDevice device = parseNetworkManagerDevice(*text);
         if (alive && device.managed) {
             addManagement(*ifindex, device, path, timeOf(path), profiles, facts);
+        } else if (alive) {
+            facts.unmanagedLinks.push_back(*ifindex);
         }
         for (const auto& lease :
              {networkManagerLease4(device.options4), networkManagerLease6(device.options6)}) {

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstdint>
 #include <optional>
 #include <string>
 #include <vector>
@@ -22,6 +23,10 @@ struct ClientFacts {
     std::vector<LinkConfiguration> configurations;  ///< of files that such programs would read
     std::vector<ClientProcess> processes;
     std::vector<ManagerProcess> managers;
+    /// Managers that run and could not be asked what they do: their files alone are known.
+    std::vector<Client> unheardManagers;
+    /// Indexes of the links that NetworkManager's files say it leaves alone.
+    std::vector<std::uint32_t> unmanagedLinks;
     /// Clients of which this user may not know whether they run in this network namespace.
     std::vector<ClientProcess> hiddenClients;
     bool processesHidden = false;  ///< those of other users, as by hidepid=2 (proc(5))

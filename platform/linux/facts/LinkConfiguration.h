@@ -6,17 +6,23 @@
 #include <vector>
 
 #include "facts/Client.h"
+#include "facts/NamePatterns.h"
 #include "formats/InterfaceName.h"
 #include "formats/IpAddress.h"
 
 namespace ZR::Live {
 
 /// What a program that manages a link, or a configuration file for such a program,
-/// says about how the link gets its addresses. It names the link by index or by name.
+/// says about how the link gets its addresses. It names the link by index, by name or by
+/// hardware address.
 struct LinkConfiguration {
     Client client{};
-    std::uint32_t ifindex = 0;                     ///< 0 when it names the link by name
-    std::optional<InterfaceName> interfaceName{};  ///< nullopt when it names the link by index
+    std::uint32_t ifindex = 0;                     ///< 0 when it names the link otherwise
+    std::optional<InterfaceName> interfaceName{};  ///< nullopt when it names the link otherwise
+    /// As Link::hardwareAddress; empty when it names the link otherwise. Such a one tells what
+    /// becomes of the link with its next cable, and counts while it has none.
+    std::string hardwareAddress{};
+    NamePatterns names{};       ///< of which the link's is to be one
     std::optional<bool> dhcp4;  ///< nullopt when it does not tell, or cannot be read
     std::optional<bool> dhcp6;
     std::vector<IpAddress> staticAddresses;  ///< of IPv4

@@ -1,9 +1,11 @@
 #include "kernel/Link.h"
 
+#include <linux/if_ether.h>
 #include <linux/if_link.h>
 #include <linux/netlink.h>
 #include <linux/rtnetlink.h>
 
+#include "formats/Hexadecimal.h"
 #include "kernel/Attributes.h"
 
 namespace ZR::Live {
@@ -43,6 +45,11 @@ bool parseAttribute(const Attribute& attribute, Link& link) {
                 return true;
             }
             return false;
+        case IFLA_ADDRESS:
+            if (attribute.payload.size() == ETH_ALEN) {
+                link.hardwareAddress = hexadecimal(attribute.payload, "");
+            }
+            return true;
         case IFLA_OPERSTATE:
             link.operstate = valueAt<std::uint8_t>(attribute.payload).value_or(0);
             return true;

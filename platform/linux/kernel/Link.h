@@ -23,6 +23,8 @@ struct Link {
     bool hasParentDevice = false;  ///< sits on a bus: a real or paravirtual device
     std::optional<bool> carrier;   ///< nullopt when the kernel does not tell
     bool wireless = false;         ///< not from netlink, which does not know it
+    /// Twelve digits, hexadecimal and small; empty for one that is not of six bytes.
+    std::string hardwareAddress{};
     /// Where the other end of a virtual cable lies, as this network namespace numbers the
     /// others; nullopt for all else, and for a cable within the namespace.
     std::optional<std::int32_t> farNamespace = std::nullopt;

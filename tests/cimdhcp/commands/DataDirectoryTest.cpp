@@ -50,6 +50,23 @@ TEST_F(DataDirectory, ThatIsMissingIsTold) {
     EXPECT_THAT(found[0].remedy, HasSubstr("mkdir -p " + data() + "/none/"));
 }
 
+TEST_F(DataDirectory, ThatIsALinkToItselfIsTold) {
+    fs::create_symlink("loop", directory_ / "loop");
+    EXPECT_EQ(findings(directory_ / "loop"),
+              (std::vector<Finding>{
+                  {Verdict::bad, "data directory",
+                   (directory_ / "loop") + "/: Too many levels of symbolic links",
+                   "remove the link that leads to itself, and make a directory there"}}));
+}
+
+TEST_F(DataDirectory, ThatIsAFileIsTold) {
+    ZR::Testing::writeFile(directory_ / "file", "");
+    EXPECT_EQ(findings(directory_ / "file"),
+              (std::vector<Finding>{
+                  {Verdict::bad, "data directory", (directory_ / "file") + "/: Not a directory",
+                   "make it a directory that this user may look into, or set DATA_DIR"}}));
+}
+
 TEST_F(DataDirectory, WhoseFilesShellsReadIsWarnedOfUnderWhateverName) {
     const std::string link = directory_ / "link";
     fs::create_symlink("sourced", link);

@@ -5,6 +5,7 @@ need nmcli
 processes=(NetworkManager dhclient dhcpcd nm-dhcp-helper)
 client_name='@(NetworkManager|dhclient|dhcpcd)'
 follows_name=no
+asked_on_bus=(NetworkManager)
 # Without a cable no profile is active, after some seconds.
 without_cable='@(true|false)'
 prepare_networkmanager "dhcp=$backend" $'method=auto\ndhcp-timeout=2147483647' method=disabled

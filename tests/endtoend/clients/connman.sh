@@ -6,15 +6,16 @@ client_name=connman
 address_stays=yes
 tells_server=no
 follows_name=no
-# It lists no service for a link without a cable, and has it no more.
-without_cable=false
+asked_on_bus=(connmand)
 # Without a server it soon takes an address of its own, and asks again after minutes.
 gives_up=yes
+source_of_none='@(0|4)'
 in_client mkdir -p /var/lib/connman
 start_bus
 start_client() {
     is_running connmand || background connmand -n -i eth1
 }
+misses_cable() { [[ -z $(service) ]]; }
 service() { in_client connmanctl services | sed -n 's/.* \(ethernet_[0-9a-f]*_cable\)$/\1/p'; }
 stop_client() { kill_processes TERM connmand; }
 said_address() {

@@ -12,6 +12,7 @@ stop_client() {
     in_client dhcpcd -k </dev/null >>"$work/client.log" 2>&1
     eventually not_running dhcpcd
 }
+kill_link() { ask_running -k "$current" || (($? == 1)); }
 renew_client() { ask_running -n "$current"; }
 # It does not take a second request to renew soon after the first.
 ask_anew() {

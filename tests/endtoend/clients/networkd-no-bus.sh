@@ -2,3 +2,4 @@
 start_bus() { :; }
 source "$clients/networkd.sh"
 unset -f renew_client ask_anew
+asked_on_bus=()

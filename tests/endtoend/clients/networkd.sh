@@ -5,6 +5,7 @@ need networkctl
 processes=(systemd-network)
 client_name=systemd-networkd
 follows_name=no
+asked_on_bus=(systemd-network)
 in_client mkdir -p /run/systemd/netif/links /run/systemd/netif/leases /run/systemd/netif/lldp
 in_client chown -R systemd-network: /run/systemd/netif
 write_in_client /etc/systemd/network/10-eth1.network <<'FILE'

@@ -786,6 +786,40 @@ TEST_F(DecideTest, ServersOfIPv6StandBehindThoseOfIPv4) {
 
 // --- ports
 
+TEST_F(DecideTest, WhatAManagerThatIsNotHeardMayDoIsNotKnown) {
+    facts_.clients.unheardManagers = {Client::NetworkManager};
+    EXPECT_EQ(enabled(), PropertyValue{});
+    EXPECT_EQ(source(), number(0)) << "there is no address";
+    EXPECT_THAT(diagnostics(), ElementsAre("eth0: NetworkManager does not respond: whether it uses "
+                                           "DHCP here cannot be told"));
+    EXPECT_EQ(kinds(), std::vector{Diagnostic::Kind::Note});
+    configuration(true);
+    EXPECT_EQ(diagnostics().size(), 1U) << "it may have applied it";
+    management(true).client = Client::NetworkManager;
+    EXPECT_EQ(enabled(), PropertyValue{true});
+    EXPECT_THAT(diagnostics(), IsEmpty());
+    facts_.clients.managements.back().dhcp4 = false;
+    EXPECT_EQ(enabled(), PropertyValue{false});
+}
+
+TEST_F(DecideTest, WhetherDhcpv6GaveAnAddressAManagerThatIsNotHeardDoesNotTell) {
+    facts_.clients.unheardManagers = {Client::Networkd};
+    management(false, std::nullopt);
+    EXPECT_EQ(enabled(), PropertyValue{false});
+    address("2001:db8::7", 600, 0);
+    EXPECT_EQ(enabled(), PropertyValue{});
+    EXPECT_EQ(source(), PropertyValue{});
+    EXPECT_THAT(diagnostics(), ElementsAre("eth0: systemd-networkd does not respond: whether it "
+                                           "uses DHCP here cannot be told"));
+    facts_.clients.managements.back().dhcp6 = true;
+    EXPECT_EQ(enabled(), PropertyValue{true});
+    EXPECT_EQ(source(), PropertyValue{});
+    EXPECT_THAT(diagnostics(), ElementsAre("eth0: systemd-networkd does not respond: whether it "
+                                           "has a lease cannot be told"));
+    address("192.0.2.7");
+    EXPECT_EQ(source(), number(3)) << "that of the IPv4 address";
+}
+
 TEST_F(DecideTest, PortsOfBridgesAndBondsHaveNoDhcpOfTheirOwn) {
     for (const char* master : {"bridge", "bond"}) {
         enslave(master);

@@ -131,6 +131,100 @@ TEST_F(MachineTest, ACableThatLeadsOutOfAContainerIsAnInterface) {
     EXPECT_EQ(machine().interfaces().size(), 2U);
 }
 
+/// The management of a link without a cable, by connman.
+LinkConfiguration withoutCable(const std::string& hardwareAddress) {
+    return {.client = Client::Connman,
+            .hardwareAddress = hardwareAddress,
+            .dhcp4 = true,
+            .dhcp6 = {},
+            .staticAddresses = {}};
+}
+
+TEST_F(MachineTest, ALinkWithoutACableIsKnownByItsHardwareAddress) {
+    facts_.links[0].hardwareAddress = facts_.links[1].hardwareAddress = "5293d4ee0eca";
+    facts_.links[0].kind = "bridge";
+    facts_.clients.managements = {withoutCable("5293d4ee0eca")};
+    const auto count = [this] { return machine().interfaces()[1].managements.size(); };
+    EXPECT_EQ(count(), 1U) << "the bridge has the address of its port";
+    EXPECT_EQ(first().managements.size(), 0U);
+    facts_.clients.managements[0].names.left = {"eth*"};
+    EXPECT_EQ(count(), 0U) << "it was told to leave it alone";
+    facts_.clients.managements[0].names = {};
+    facts_.links[1].flags |= IFF_LOWER_UP;
+    EXPECT_EQ(count(), 0U) << "with a cable, the bus has to tell of it";
+    facts_.links[1].flags &= ~std::uint32_t{IFF_LOWER_UP};
+    facts_.links[1].hardwareAddress = "5293d4ee0ecb";
+    EXPECT_EQ(count(), 0U);
+}
+
+TEST_F(MachineTest, ACableThatIsOutIsAnInterfaceThatItsManagerTakes) {
+    for (Link& link : facts_.links) {
+        link.kind = "veth";
+        link.hardwareAddress = "5293d4ee0ec" + std::to_string(link.ifindex);
+    }
+    facts_.addresses.clear();
+    facts_.clients.managements = {withoutCable("5293d4ee0ec3")};
+    ASSERT_EQ(machine().interfaces().size(), 1U);
+    EXPECT_EQ(first().link->ifindex, 3U);
+}
+
+TEST_F(MachineTest, AManagerThatWasNotHeardMayHaveWhatItsFilesDoNotTell) {
+    auto& clients = facts_.clients;
+    clients.unheardManagers = {Client::NetworkManager};
+    EXPECT_EQ(first().unheard, Client::NetworkManager) << "it may have taken it just now";
+    EXPECT_TRUE(first().hidden);
+    EXPECT_EQ(first().unheard6, std::nullopt);
+    clients.unmanagedLinks = {2};
+    EXPECT_EQ(first().unheard, std::nullopt);
+    EXPECT_FALSE(first().hidden);
+    EXPECT_EQ(machine().interfaces()[1].unheard, Client::NetworkManager);
+    clients.unmanagedLinks.clear();
+    clients.managements = {{.client = Client::NetworkManager,
+                            .ifindex = 2,
+                            .dhcp4 = {},
+                            .dhcp6 = {},
+                            .staticAddresses = {}}};
+    EXPECT_EQ(first().unheard, Client::NetworkManager);
+    for (const bool dhcp4 : {true, false}) {
+        clients.managements[0].dhcp4 = dhcp4;
+        EXPECT_EQ(first().unheard, std::nullopt) << "its file tells";
+    }
+    facts_.links[0].flags = IFF_UP | IFF_POINTOPOINT;
+    clients.managements.clear();
+    EXPECT_EQ(first().unheard, std::nullopt);
+}
+
+TEST_F(MachineTest, NetworkdWritesOfEachLinkThatItTakes) {
+    auto& clients = facts_.clients;
+    clients.unheardManagers = {Client::Networkd};
+    EXPECT_EQ(first().unheard, std::nullopt);
+    clients.managements = {{.client = Client::Networkd,
+                            .ifindex = 2,
+                            .dhcp4 = {},
+                            .dhcp6 = {},
+                            .staticAddresses = {}}};
+    EXPECT_EQ(first().unheard, Client::Networkd);
+}
+
+TEST_F(MachineTest, AnIPv6AddressOfAManagerThatWasNotHeardMayBeLeased) {
+    auto& clients = facts_.clients;
+    clients.unheardManagers = {Client::Networkd};
+    clients.managements = {{.client = Client::Networkd,
+                            .ifindex = 2,
+                            .dhcp4 = false,
+                            .dhcp6 = {},
+                            .staticAddresses = {}}};
+    EXPECT_EQ(first().unheard6, std::nullopt);
+    facts_.addresses.push_back({.ifindex = 2, .ip = "2001:db8::2"_ip, .validLifetime = 600});
+    EXPECT_EQ(first().unheard6, Client::Networkd);
+    EXPECT_EQ(first().unheard, std::nullopt);
+    clients.leases = {lease("eth2", "2001:db8::2")};
+    EXPECT_EQ(first().unheard6, std::nullopt) << "whose lease it is, is known";
+    clients.leases.clear();
+    facts_.addresses.back().validLifetime = Address::infinite;
+    EXPECT_EQ(first().unheard6, std::nullopt);
+}
+
 TEST_F(MachineTest, ARenamedLinkIsKnownByItsAddressAndTheAddressesEnd) {
     facts_.clients.leases = {lease("before", "192.0.2.3")};
     EXPECT_EQ(machine().interfaces()[1].leases.size(), 1U);

@@ -4,6 +4,8 @@
 #include <gtest/gtest.h>
 #include <sys/socket.h>
 
+#include <algorithm>
+
 #include "LinuxSupport.h"
 #include "kit/Diagnostics.h"
 
@@ -23,6 +25,7 @@ TEST(ConnmanSettings, AddressOfAServiceThatUsesDhcp) {
 }
 
 TEST(ConnmanSettings, AnyTextGivesSettings) {
+    EXPECT_TRUE(parseConnmanSettings("AutoConnect=true\n").autoConnect);
     EXPECT_EQ(parseConnmanSettings("[x]\nIPv4.method=manual\nIPv4.DHCP.LastAddress=198.51.100\n"),
               ConnmanSettings{});
     EXPECT_EQ(parseConnmanSettings("IPv4.method\n=dhcp\n[\n"), ConnmanSettings{});
@@ -54,6 +57,56 @@ TEST_F(ConnmanTest, WhileItRunsItsAddressesAreClaims) {
                                                 .origin = directory + "/settings"}));
     EXPECT_THAT(facts.places, testing::Contains(WatchedPlace{directory, "settings"}));
     EXPECT_THAT(ZR::Testing::textsOf(facts.diagnostics), IsEmpty());
+}
+
+TEST_F(ConnmanTest, ALinkWithoutACableIsNamedByItsHardwareAddress) {
+    write("ethernet_5293d4ee0eca_cable", "AutoConnect=true\nIPv4.method=dhcp\n");
+    write("ethernet_5293d4ee0ecb_cable", "AutoConnect=false\nIPv4.method=dhcp\n");
+    write("ethernet_5293d4ee0ecc_cable", "AutoConnect=true\nIPv4.method=manual\n");
+    write("wifi_5293d4ee0ecd_6f_psk", "AutoConnect=true\nIPv4.method=dhcp\n");
+    const std::string file = root_.path("/var/lib/connman/ethernet_5293d4ee0eca_cable/settings");
+    const NamePatterns usual{.taken = {},
+                             .left = {"vmnet*", "vboxnet*", "virbr*", "ifb*", "ve-*", "vb-*"}};
+    const auto read = [&] { return readWith(readConnman, root_, running(Client::Connman)); };
+    EXPECT_THAT(read().managements, ElementsAre(LinkConfiguration{.client = Client::Connman,
+                                                                  .hardwareAddress = "5293d4ee0eca",
+                                                                  .names = usual,
+                                                                  .dhcp4 = true,
+                                                                  .dhcp6 = {},
+                                                                  .staticAddresses = {},
+                                                                  .origin = file}));
+    root_.write("/proc/7/cmdline", std::string{"connmand\0-n\0-i\0eth1,eth2\0", 26});
+    root_.write("/etc/connman/main.conf", "[General]\nNetworkInterfaceBlacklist=eth2\n");
+    EXPECT_EQ(read().managements.at(0).names,
+              (NamePatterns{.taken = {"eth1", "eth2"}, .left = {"eth2*"}}));
+    root_.write("/var/lib/connman/settings", "[WiFi]\nEnable=true\n[Wired]\nEnable=false\n");
+    EXPECT_THAT(read().managements, IsEmpty());
+}
+
+TEST(ConnmanCommandLine, TellsWhichLinksItTakes) {
+    const auto links = [](std::string text) {
+        std::replace(text.begin(), text.end(), ' ', '\0');
+        return connmanLinks(text);
+    };
+    EXPECT_EQ(links("connmand -n "), NamePatterns{});
+    for (const char* const line :
+         {"connmand -i eth* -I eth2 ", "connmand -ieth* -Ieth2",
+          "connmand --nodevice=eth2 --device=eth*", "connmand --device eth* --nodevice eth2 "}) {
+        EXPECT_EQ(links(line), (NamePatterns{.taken = {"eth*"}, .left = {"eth2"}})) << line;
+    }
+    EXPECT_EQ(links("connmand -i ,eth1,,eth2,"),
+              (NamePatterns{.taken = {"eth1", "eth2"}, .left = {}}));
+    EXPECT_EQ(links("connmand -i"), NamePatterns{});
+    EXPECT_EQ(links(""), NamePatterns{});
+}
+
+TEST(NamesOfLinks, AreTakenByPatternsUnlessTheyAreLeft) {
+    EXPECT_TRUE(NamePatterns{}.take("eth1"_name));
+    const NamePatterns patterns{.taken = {"eth?", "en*"}, .left = {"eth2"}};
+    EXPECT_TRUE(patterns.take("eth1"_name));
+    EXPECT_TRUE(patterns.take("enp3s0"_name));
+    EXPECT_FALSE(patterns.take("eth2"_name));
+    EXPECT_FALSE(patterns.take("eth10"_name));
 }
 
 TEST_F(ConnmanTest, WhatItLeftWhenItEndedProvesNothing) {

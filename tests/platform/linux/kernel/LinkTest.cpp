@@ -24,6 +24,8 @@ std::vector<std::byte> linkInfo(const std::string& kind, const std::string& slav
     return {bytes.begin() + sizeof(nlmsghdr) + sizeof(std::uint32_t), bytes.end()};
 }
 
+constexpr std::array<std::uint8_t, 6> hardwareAddress{0x52, 0x93, 0xd4, 0xee, 0x0e, 0xca};
+
 TEST(Link, EverythingThatTheKernelTells) {
     Message message = linkMessage(7, "eth0", 0x11043);
     message.number(IFLA_OPERSTATE, std::uint8_t{6})
@@ -31,6 +33,7 @@ TEST(Link, EverythingThatTheKernelTells) {
         .number(IFLA_MASTER, std::uint32_t{9})
         .text(parentDeviceName, "0000:00:03.0")
         .text(IFLA_QDISC, "fq_codel")
+        .attribute(IFLA_ADDRESS, std::as_bytes(std::span{hardwareAddress}))
         .number(IFLA_LINK_NETNSID, std::int32_t{3});
     EXPECT_EQ(parseLink(message.bytes()), (Link{.ifindex = 7,
                                                 .name = "eth0"_name,
@@ -42,7 +45,16 @@ TEST(Link, EverythingThatTheKernelTells) {
                                                 .master = 9,
                                                 .hasParentDevice = true,
                                                 .carrier = true,
+                                                .hardwareAddress = "5293d4ee0eca",
                                                 .farNamespace = 3}));
+}
+
+TEST(Link, AHardwareAddressHasSixBytes) {
+    for (const std::size_t size : {0U, 4U, 5U}) {
+        Message message = linkMessage(7, "eth0");
+        message.attribute(IFLA_ADDRESS, std::as_bytes(std::span{hardwareAddress}).first(size));
+        EXPECT_EQ(parseLink(message.bytes())->hardwareAddress, "") << size;
+    }
 }
 
 TEST(Link, KindAndSlaveKindAreNested) {
