@@ -6,8 +6,8 @@
 #include <sstream>
 
 #include "text/DisplayText.h"
-#include "text/Duration.h"
 #include "text/JsonText.h"
+#include "text/Times.h"
 
 namespace cimdhcp {
 

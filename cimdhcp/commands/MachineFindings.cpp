@@ -10,7 +10,7 @@
 #include "client/InterfaceState.h"
 #include "commands/DiagnosticText.h"
 #include "text/DisplayText.h"
-#include "text/Moment.h"
+#include "text/Times.h"
 
 namespace cimdhcp {
 

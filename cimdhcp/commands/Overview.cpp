@@ -10,7 +10,7 @@
 #include "commands/DiagnosticText.h"
 #include "text/DisplayText.h"
 #include "text/JsonText.h"
-#include "text/Moment.h"
+#include "text/Times.h"
 #include "zrclient/NodeLexicon.h"
 
 namespace cimdhcp {

@@ -3,8 +3,8 @@
 # program shows is compared with what the client and the kernel say.
 #
 # Usage: dhcp-events.sh PATH-OF-cimdhcp PATH-OF-tree-on-request CLIENT EVENTS
-# CLIENT: one of the files in clients/; EVENTS: life (leases of ten minutes) or end (of
-# twenty seconds, which end).
+# CLIENT: one of the files in clients/, or NetworkManager-PROGRAM; EVENTS: life (leases of
+# ten minutes) or end (of twenty seconds, which end).
 set -euo pipefail
 
 program=$1
@@ -34,7 +34,7 @@ drops_address=yes     # whether it takes its address away when the cable is out
 loses_name=no         # whether nothing ties it to its link then
 asked_on_bus=()       # the names of its processes that respond on the system bus
 follows_name=yes      # whether it goes on when its link gets another name
-source "$clients/$kind.sh"
+source "$clients/${kind%-@(dhclient|dhcpcd)}.sh"
 
 leased() {
     local address

@@ -1,4 +1,4 @@
-#include "text/Moment.h"
+#include "text/Times.h"
 
 #include <algorithm>
 #include <array>
@@ -22,6 +22,15 @@ constexpr std::int64_t firstMoment = 0;
 constexpr std::int64_t lastMoment = 253'402'300'799;  // 9999-12-31T23:59:59Z
 
 }  // namespace
+
+std::string durationText(std::chrono::duration<double> duration) {
+    using std::chrono::milliseconds;
+    const auto whole = std::max(std::chrono::round<milliseconds>(duration), milliseconds::zero());
+    constexpr std::int64_t perSecond = 1000;
+    std::string fraction = std::to_string(whole.count() % perSecond);
+    fraction.insert(0, 3 - fraction.size(), '0');
+    return std::to_string(whole.count() / perSecond) + '.' + fraction + " s";
+}
 
 std::string relativeText(std::int64_t moment, std::int64_t now) {
     const std::int64_t bounded = std::clamp(moment, firstMoment, lastMoment);

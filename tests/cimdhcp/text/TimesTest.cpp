@@ -1,4 +1,4 @@
-#include "text/Moment.h"
+#include "text/Times.h"
 
 #include <gtest/gtest.h>
 
@@ -40,6 +40,15 @@ TEST(Moment, HasAFormForPrograms) {
     EXPECT_EQ(isoText(0), "1970-01-01T00:00:00Z");
     EXPECT_EQ(isoText(253'402'300'799), "9999-12-31T23:59:59Z");
     EXPECT_EQ(isoText(std::numeric_limits<std::int64_t>::max()), "9999-12-31T23:59:59Z");
+}
+
+TEST(Duration, IsInSecondsToTheMillisecond) {
+    using Seconds = std::chrono::duration<double>;
+    EXPECT_EQ(durationText(Seconds(0)), "0.000 s");
+    EXPECT_EQ(durationText(Seconds(0.0123)), "0.012 s");
+    EXPECT_EQ(durationText(Seconds(1.9999)), "2.000 s");
+    EXPECT_EQ(durationText(Seconds(75.5)), "75.500 s");
+    EXPECT_EQ(durationText(Seconds(-1)), "0.000 s");
 }
 
 }  // namespace

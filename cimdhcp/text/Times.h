@@ -1,9 +1,13 @@
 #pragma once
 
+#include <chrono>
 #include <cstdint>
 #include <string>
 
 namespace cimdhcp {
+
+/// "0.123 s"
+[[nodiscard]] std::string durationText(std::chrono::duration<double> duration);
 
 /// A moment as it lies from another one: "in 4 h", "12 min ago"; one that is more than a
 /// hundred days away by its date (UTC), "2027-03-01". Both in seconds since the epoch.

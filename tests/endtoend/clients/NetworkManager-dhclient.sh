@@ -1,4 +1,0 @@
-# NetworkManager, which starts dhclient.
-need dhclient
-backend=dhclient
-source "$clients/NetworkManager.sh"

@@ -1,4 +1,0 @@
-# NetworkManager, which starts dhcpcd.
-need dhcpcd
-backend=dhcpcd
-source "$clients/NetworkManager.sh"
