@@ -192,10 +192,17 @@ RequestEnd ObjectManager::Implementation::associated(ObjectPath path,
         const Associations associations = associationsOf(path, request.assocClass, request);
         std::vector<CallOutcome> calls;
         for (const auto& [provider, classes] : byProvider(associations.classes)) {
+            // Most objects of a result are of one class: what holds for it is kept.
+            std::optional<std::string> judged;
+            bool fits = false;
             const auto isWanted = [&, &its = classes](const Object& object) {
                 const std::string& className = pathOf(object).className;
-                return isOfClass(className, request.resultClass, repository_) &&
-                       canBeAssociator(its, path, className, request);
+                if (judged != className) {
+                    fits = isOfClass(className, request.resultClass, repository_) &&
+                           canBeAssociator(its, path, className, request);
+                    judged = className;
+                }
+                return fits;
             };
             const auto ask = [&, asked = provider](ResultReceiver<Object>& taker) {
                 RequestedObjects<Object> requested(taker, surroundings(path), request.propertyList,

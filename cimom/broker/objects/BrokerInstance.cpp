@@ -105,14 +105,15 @@ bool isKey(const ClassDeclaration& declaration, const PropertyDeclaration& prope
 
 /// Takes the value of a key property into the path, if the path has not had the key from
 /// the start. The path shares the value, which is in the same arena.
-void setKey(InstanceRecord& instance, const NameKey& name, const CMPIData& data) {
+void setKey(InstanceRecord& instance, const NameKey& name, const PropertyDeclaration& declared,
+            const CMPIData& data) {
     EntryList& keys = instance.path->keys;
     const CMPICount position = keys.position(name);
     if (position < instance.ownKeys) {
         return;
     }
     if ((data.state & CMPI_nullValue) == 0) {
-        keys.set(*instance.arena, name, data);
+        keys.set(*instance.arena, declared.name, data);
     } else if (position < keys.size()) {
         keys.remove(position);  // keys cannot be null
     }
@@ -145,7 +146,7 @@ CMPIrc set(InstanceRecord* instance, const char* name, const CMPIValue* value, C
         data.type = cmpiType(declared->type, declared->isArray);
     }
     if (isPathKey) {
-        setKey(*instance, NameKey(declared->name), data);
+        setKey(*instance, key, *declared, data);
     }
     if (kept) {
         instance->properties.set(*instance->arena, key, data);
@@ -205,7 +206,7 @@ CMPIStatus setObjectPath(const CMPIInstance* self, const CMPIObjectPath* path) {
             const PropertyDeclaration* const declared =
                 instance->declaration == nullptr ? nullptr : instance->declaration->property(name);
             if (declared != nullptr && isKey(*instance->declaration, *declared)) {
-                setKey(*instance, name, former[index].data);
+                setKey(*instance, name, *declared, former[index].data);
             }
         }
         return CMPI_RC_OK;

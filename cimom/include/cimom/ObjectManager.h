@@ -20,8 +20,9 @@ struct Configuration {
     /// A file of a whole CIM schema, with what it includes. It is read first, and what it
     /// declares stands: the schema directories add to it. Empty: none.
     std::filesystem::path fullSchema = {};
-    /// Gets a line about each call of a provider that failed while others were asked the same,
-    /// since the client may not be told. Any thread calls it, several at once. Empty: no log.
+    /// Gets a line about each provider that failed in a request about associations, of which
+    /// the client is not told if others responded. Any thread calls it, several at once.
+    /// Empty: no log.
     std::function<void(const std::string& line)> log = {};
 };
 
