@@ -152,16 +152,15 @@ class Examination {
     explicit Examination(Client& client) : client_(client) {}
 
     std::vector<Finding> examine() {
-        for (const ServedClass& each : servedClasses) {
-            enumerate(each);
-        }
-        if (std::none_of(served_.begin(), served_.end(),
-                         [](const Served& each) { return !each.paths.empty(); })) {
-            tellOfNothing();
-        } else {
-            for (const Served& each : served_) {
-                lookAt(each);
+        try {
+            ask();
+        } catch (const Failure& failure) {
+            if (!hasResponded_) {
+                throw;
             }
+            // The request that is not responded to is what is wrong, and the last one.
+            addWrong(failure.what(), seeTheLog);
+            tellOfWrong(asked_);
         }
         return std::move(findings_);
     }
@@ -179,6 +178,23 @@ class Examination {
 
     void add(Verdict verdict, std::string_view what, std::string detail, std::string remedy = "") {
         findings_.push_back({verdict, std::string(what), std::move(detail), std::move(remedy)});
+    }
+
+    void ask() {
+        for (const ServedClass& each : servedClasses) {
+            asked_ = each.name;
+            enumerate(each);
+            hasResponded_ = true;
+        }
+        if (std::none_of(served_.begin(), served_.end(),
+                         [](const Served& each) { return !each.paths.empty(); })) {
+            tellOfNothing();
+            return;
+        }
+        for (const Served& each : served_) {
+            asked_ = each.served->name;
+            lookAt(each);
+        }
     }
 
     /// A response that is wrong. Of those of one class with one remedy, the first stands for
@@ -236,7 +252,6 @@ class Examination {
             tellOfNone(*each.served);
             return;
         }
-        wrong_.clear();
         compareNames(each);
         follow(*each.served, each.paths.front());
         if (each.paths.size() > 1) {
@@ -245,18 +260,23 @@ class Examination {
         if (const auto nothing = pathOfNothing(each.paths.back())) {
             getNothing(*each.served, *nothing);
         }
+        if (wrong_.empty()) {
+            add(Verdict::good, each.served->name,
+                counted(each.paths.size(), "instance", "instances"));
+        }
+        tellOfWrong(each.served->name);
+    }
+
+    void tellOfWrong(std::string_view className) {
         for (const Wrong& wrong : wrong_) {
-            add(Verdict::bad, each.served->name,
+            add(Verdict::bad, className,
                 wrong.detail +
                     (wrong.others == 0
                          ? ""
                          : " (and " + counted(wrong.others, "response", "responses") + " like it)"),
                 wrong.remedy);
         }
-        if (wrong_.empty()) {
-            add(Verdict::good, each.served->name,
-                counted(each.paths.size(), "instance", "instances"));
-        }
+        wrong_.clear();
     }
 
     void tellOfNone(const ServedClass& served) {
@@ -361,6 +381,8 @@ class Examination {
     Client& client_;
     std::vector<Served> served_;
     std::vector<Wrong> wrong_;  ///< of the class that is looked at
+    std::string_view asked_;    ///< that class
+    bool hasResponded_ = false;
     std::vector<Finding> findings_;
 };
 

@@ -82,6 +82,9 @@ class Manager : public Client {
     }
     Response enumerate(const ObjectPath& path) override {
         Response response{"EnumerateInstances", {}, std::nullopt, {}, {}};
+        if (silent == "all") {
+            throw Failure(ExitStatus::notLoaded, "no response");
+        }
         if (const auto failing = failures.find(path.className); failing != failures.end()) {
             response.status = failing->second;
             return response;
@@ -92,6 +95,9 @@ class Manager : public Client {
         return response;
     }
     Response get(const ObjectPath& path) override {
+        if (path.className == silent) {
+            throw Failure(ExitStatus::notLoaded, "no response");
+        }
         Response response{"GetInstance", {}, std::nullopt, {}, {}};
         for (const Instance& each : instances[path.className]) {
             if (alwaysTheFirst.contains(path.className) || each.path == path) {
@@ -121,6 +127,7 @@ class Manager : public Client {
     std::map<std::string, std::vector<Instance>> instances;
     std::map<std::string, cimom::Status> failures;
     std::set<std::string> alwaysTheFirst;  ///< classes of which any path gets the first
+    std::string silent;                    ///< a class that no request for is responded to
     bool unfiltered = false;               ///< every association refers to everything
     cimom::Status referencesStatus;
 
@@ -294,6 +301,16 @@ TEST(ServerFindings, TellThatReferencesFail) {
                                  "CIM_ERR_FAILED: libOther.so was not found (and 1 response like "
                                  "it)",
                                  "the library is not in a directory")));
+}
+
+TEST(ServerFindings, EndWithARequestThatIsNotRespondedTo) {
+    Manager manager;
+    manager.silent = "QVXZR_DHCPSettingData";
+    const std::vector<Finding> findings = serverFindings(manager);
+    EXPECT_THAT(findings, SizeIs(4));
+    EXPECT_THAT(findings.back(), finding("QVXZR_DHCPSettingData", "no response", "manager's log"));
+    manager.silent = "all";
+    EXPECT_THROW(static_cast<void>(serverFindings(manager)), Failure);
 }
 
 TEST(ServerFindings, HostsAndNamespacesInReferencesDoNotCount) {
