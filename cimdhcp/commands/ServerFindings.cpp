@@ -152,15 +152,25 @@ class Examination {
     explicit Examination(Client& client) : client_(client) {}
 
     std::vector<Finding> examine() {
-        try {
-            ask();
-        } catch (const Failure& failure) {
-            if (!hasResponded_) {
-                throw;
+        for (const ServedClass& each : servedClasses) {
+            try {
+                enumerate(each);
+                hasResponded_ = true;
+            } catch (const Failure& failure) {
+                if (!hasResponded_) {
+                    throw;
+                }
+                // Of a server that has responded, silence is a wrong response, too.
+                addAlike(Verdict::bad, each.name, failure.what(), seeTheLog);
             }
-            // The request that is not responded to is what is wrong, and the last one.
-            addWrong(failure.what(), seeTheLog);
-            tellOfWrong(asked_);
+        }
+        if (std::none_of(served_.begin(), served_.end(),
+                         [](const Served& each) { return !each.paths.empty(); })) {
+            tellOfNothing();
+        } else {
+            for (const Served& each : served_) {
+                lookAt(each);
+            }
         }
         return std::move(findings_);
     }
@@ -178,23 +188,6 @@ class Examination {
 
     void add(Verdict verdict, std::string_view what, std::string detail, std::string remedy = "") {
         findings_.push_back({verdict, std::string(what), std::move(detail), std::move(remedy)});
-    }
-
-    void ask() {
-        for (const ServedClass& each : servedClasses) {
-            asked_ = each.name;
-            enumerate(each);
-            hasResponded_ = true;
-        }
-        if (std::none_of(served_.begin(), served_.end(),
-                         [](const Served& each) { return !each.paths.empty(); })) {
-            tellOfNothing();
-            return;
-        }
-        for (const Served& each : served_) {
-            asked_ = each.served->name;
-            lookAt(each);
-        }
     }
 
     /// A response that is wrong. Of those of one class with one remedy, the first stands for
@@ -252,6 +245,19 @@ class Examination {
             tellOfNone(*each.served);
             return;
         }
+        try {
+            lookAtInstances(each);
+        } catch (const Failure& failure) {
+            addWrong(failure.what(), seeTheLog);
+        }
+        if (wrong_.empty()) {
+            add(Verdict::good, each.served->name,
+                counted(each.paths.size(), "instance", "instances"));
+        }
+        tellOfWrong(each.served->name);
+    }
+
+    void lookAtInstances(const Served& each) {
         compareNames(each);
         follow(*each.served, each.paths.front());
         if (each.paths.size() > 1) {
@@ -260,11 +266,6 @@ class Examination {
         if (const auto nothing = pathOfNothing(each.paths.back())) {
             getNothing(*each.served, *nothing);
         }
-        if (wrong_.empty()) {
-            add(Verdict::good, each.served->name,
-                counted(each.paths.size(), "instance", "instances"));
-        }
-        tellOfWrong(each.served->name);
     }
 
     void tellOfWrong(std::string_view className) {
@@ -381,7 +382,6 @@ class Examination {
     Client& client_;
     std::vector<Served> served_;
     std::vector<Wrong> wrong_;  ///< of the class that is looked at
-    std::string_view asked_;    ///< that class
     bool hasResponded_ = false;
     std::vector<Finding> findings_;
 };
