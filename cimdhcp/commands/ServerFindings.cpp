@@ -153,7 +153,16 @@ class Examination {
 
     std::vector<Finding> examine() {
         for (const ServedClass& each : servedClasses) {
-            enumerate(each);
+            try {
+                enumerate(each);
+                hasResponded_ = true;
+            } catch (const Failure& failure) {
+                if (!hasResponded_) {
+                    throw;
+                }
+                // Of a server that has responded, silence is a wrong response, too.
+                addAlike(Verdict::bad, each.name, failure.what(), seeTheLog);
+            }
         }
         if (std::none_of(served_.begin(), served_.end(),
                          [](const Served& each) { return !each.paths.empty(); })) {
@@ -236,7 +245,19 @@ class Examination {
             tellOfNone(*each.served);
             return;
         }
-        wrong_.clear();
+        try {
+            lookAtInstances(each);
+        } catch (const Failure& failure) {
+            addWrong(failure.what(), seeTheLog);
+        }
+        if (wrong_.empty()) {
+            add(Verdict::good, each.served->name,
+                counted(each.paths.size(), "instance", "instances"));
+        }
+        tellOfWrong(each.served->name);
+    }
+
+    void lookAtInstances(const Served& each) {
         compareNames(each);
         follow(*each.served, each.paths.front());
         if (each.paths.size() > 1) {
@@ -245,18 +266,18 @@ class Examination {
         if (const auto nothing = pathOfNothing(each.paths.back())) {
             getNothing(*each.served, *nothing);
         }
+    }
+
+    void tellOfWrong(std::string_view className) {
         for (const Wrong& wrong : wrong_) {
-            add(Verdict::bad, each.served->name,
+            add(Verdict::bad, className,
                 wrong.detail +
                     (wrong.others == 0
                          ? ""
                          : " (and " + counted(wrong.others, "response", "responses") + " like it)"),
                 wrong.remedy);
         }
-        if (wrong_.empty()) {
-            add(Verdict::good, each.served->name,
-                counted(each.paths.size(), "instance", "instances"));
-        }
+        wrong_.clear();
     }
 
     void tellOfNone(const ServedClass& served) {
@@ -361,6 +382,7 @@ class Examination {
     Client& client_;
     std::vector<Served> served_;
     std::vector<Wrong> wrong_;  ///< of the class that is looked at
+    bool hasResponded_ = false;
     std::vector<Finding> findings_;
 };
 

@@ -82,6 +82,9 @@ class Manager : public Client {
     }
     Response enumerate(const ObjectPath& path) override {
         Response response{"EnumerateInstances", {}, std::nullopt, {}, {}};
+        if (silent.contains(path.className)) {
+            throw Failure(ExitStatus::notLoaded, "no response");
+        }
         if (const auto failing = failures.find(path.className); failing != failures.end()) {
             response.status = failing->second;
             return response;
@@ -92,6 +95,9 @@ class Manager : public Client {
         return response;
     }
     Response get(const ObjectPath& path) override {
+        if (path.className == silentGet) {
+            throw Failure(ExitStatus::notLoaded, "no response");
+        }
         Response response{"GetInstance", {}, std::nullopt, {}, {}};
         for (const Instance& each : instances[path.className]) {
             if (alwaysTheFirst.contains(path.className) || each.path == path) {
@@ -121,6 +127,8 @@ class Manager : public Client {
     std::map<std::string, std::vector<Instance>> instances;
     std::map<std::string, cimom::Status> failures;
     std::set<std::string> alwaysTheFirst;  ///< classes of which any path gets the first
+    std::set<std::string> silent;          ///< classes whose enumeration has no response
+    std::string silentGet;                 ///< a class whose instances cannot be asked for
     bool unfiltered = false;               ///< every association refers to everything
     cimom::Status referencesStatus;
 
@@ -294,6 +302,20 @@ TEST(ServerFindings, TellThatReferencesFail) {
                                  "CIM_ERR_FAILED: libOther.so was not found (and 1 response like "
                                  "it)",
                                  "the library is not in a directory")));
+}
+
+TEST(ServerFindings, TellOfRequestsThatAreNotRespondedTo) {
+    Manager manager;
+    manager.silent = {"QVXZR_DHCPSettingData", "QVXZR_DHCPOrderedComponent"};
+    EXPECT_THAT(wrong(manager),
+                ElementsAre(finding("QVXZR_DHCPSettingData, QVXZR_DHCPOrderedComponent",
+                                    "no response", "manager's log")));
+    manager.silent = {"QVXZR_DHCPProtocolEndpoint"};
+    EXPECT_THROW(static_cast<void>(serverFindings(manager)), Failure);
+    manager.silent.clear();
+    manager.silentGet = "QVXZR_DHCPCapabilities";
+    EXPECT_THAT(wrong(manager),
+                ElementsAre(finding("QVXZR_DHCPCapabilities", "no response", "manager's log")));
 }
 
 TEST(ServerFindings, HostsAndNamespacesInReferencesDoNotCount) {
