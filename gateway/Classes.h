@@ -17,6 +17,9 @@ struct Property {
     const char* name;
     CMPIType type;
     Presence presence;
+    /// The standard schema declares a default, which some object managers show for a
+    /// property that is not set.
+    bool hasDefault = false;
 };
 
 /// Who has the instances of a class.

@@ -1,11 +1,24 @@
 #include "Collector.h"
 
+#include <utility>
+
 namespace ZR::DHCPClientGateway {
 
-/// The functions of the record. None of them throws anything but what a lack of memory
-/// does, and then into a provider of this library, which goes on without the object.
+/// The functions of the record.
 struct Collector::Slots {
-    static Collector& of(const CMPIResult* result) { return *static_cast<Collector*>(result->hdl); }
+    static CMPIStatus handOn(const CMPIResult* result, const CMPIObjectPath* path,
+                             const CMPIInstance* instance) noexcept {
+        Collector& collector = *static_cast<Collector*>(result->hdl);
+        if (collector.thrown_ == nullptr) {
+            try {
+                collector.take_(path, instance);
+                return {CMPI_RC_OK, nullptr};
+            } catch (...) {
+                collector.thrown_ = std::current_exception();
+            }
+        }
+        return {CMPI_RC_ERR_FAILED, nullptr};
+    }
 
     static CMPIStatus release(CMPIResult* /*self*/) { return {CMPI_RC_OK, nullptr}; }
 
@@ -22,13 +35,11 @@ struct Collector::Slots {
     }
 
     static CMPIStatus returnInstance(const CMPIResult* self, const CMPIInstance* instance) {
-        of(self).instances_.push_back(instance);
-        return {CMPI_RC_OK, nullptr};
+        return handOn(self, nullptr, instance);
     }
 
     static CMPIStatus returnObjectPath(const CMPIResult* self, const CMPIObjectPath* path) {
-        of(self).paths_.push_back(path);
-        return {CMPI_RC_OK, nullptr};
+        return handOn(self, path, nullptr);
     }
 
     static CMPIStatus returnDone(const CMPIResult* /*self*/) { return {CMPI_RC_OK, nullptr}; }
@@ -42,6 +53,12 @@ struct Collector::Slots {
                                         &returnDone, &returnError};
 };
 
-Collector::Collector() : record_{this, &Slots::table} {}
+Collector::Collector(Take take) : record_{this, &Slots::table}, take_(std::move(take)) {}
+
+void Collector::rethrow() const {
+    if (thrown_ != nullptr) {
+        std::rethrow_exception(thrown_);
+    }
+}
 
 }  // namespace ZR::DHCPClientGateway

@@ -23,17 +23,17 @@ void copy(const CMPIInstance* from, const CMPIInstance* to, const char* name) {
 }
 
 /// The listed properties in an instance of their own.
-const CMPIInstance* listed(const Request& request, const ServedClass& served, const Object& object,
-                           const char** properties) {
-    const CMPIInstance* instance = makeInstance(request, object.path);
+const CMPIInstance* listed(const Request& request, const ServedClass& served,
+                           const CMPIInstance* whole, const char** properties) {
+    const CMPIInstance* instance = makeInstance(request, whole->ft->getObjectPath(whole, nullptr));
     if (served.server == Server::otherwise) {
-        const CMPICount count = object.instance->ft->getPropertyCount(object.instance, nullptr);
+        const CMPICount count = whole->ft->getPropertyCount(whole, nullptr);
         for (CMPICount index = 0; index < count; ++index) {
             CMPIString* name = nullptr;
-            object.instance->ft->getPropertyAt(object.instance, index, &name, nullptr);
+            whole->ft->getPropertyAt(whole, index, &name, nullptr);
             const char* text = name == nullptr ? nullptr : name->ft->getCharPtr(name, nullptr);
-            if (text != nullptr && lists(properties, text) && hasValue(object.instance, text)) {
-                copy(object.instance, instance, text);
+            if (text != nullptr && lists(properties, text) && hasValue(whole, text)) {
+                copy(whole, instance, text);
             }
         }
     }
@@ -42,8 +42,8 @@ const CMPIInstance* listed(const Request& request, const ServedClass& served, co
         if (property.type != CMPI_ref && !lists(properties, property.name)) {
             continue;
         }
-        if (property.presence != Presence::never && hasValue(object.instance, property.name)) {
-            copy(object.instance, instance, property.name);
+        if (property.presence != Presence::never && hasValue(whole, property.name)) {
+            copy(whole, instance, property.name);
         } else {
             setNull(instance, property);
         }
@@ -66,17 +66,20 @@ bool lists(const char** properties, const char* name) noexcept {
 }
 
 const CMPIInstance* completed(const Request& request, const ServedClass& served,
-                              const Object& object, const char** properties) {
+                              const CMPIInstance* instance, const char** properties) {
     if (properties != nullptr) {
-        return listed(request, served, object, properties);
+        return listed(request, served, instance, properties);
     }
     for (const Property& property : served.properties) {
-        if (property.presence == Presence::never || (property.presence == Presence::sometimes &&
-                                                     !hasValue(object.instance, property.name))) {
-            setNull(object.instance, property);
+        const bool unset =
+            property.hasDefault &&
+            (property.presence == Presence::never ||
+             (property.presence == Presence::sometimes && !hasValue(instance, property.name)));
+        if (unset) {
+            setNull(instance, property);
         }
     }
-    return object.instance;
+    return instance;
 }
 
 }  // namespace ZR::DHCPClientGateway

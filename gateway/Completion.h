@@ -12,10 +12,11 @@ namespace ZR::DHCPClientGateway {
 [[nodiscard]] bool lists(const char** properties, const char* name) noexcept;
 
 /// The instance as a client with this property list gets it: without what the list leaves
-/// out, and with a null for each further property of the class, where some object managers
-/// would put the default of the schema. Of a class of another provider, properties that it
-/// leaves unset stay so. References of associations are always there. Throws Refusal.
+/// out, with a null for each listed property that is not known, and without a list for
+/// those of them of which some object managers would show the default of the schema: a null
+/// and a property that is not there mean the same. Of a class of another provider, properties that
+/// it leaves unset stay so. References of associations are always there. Throws Refusal.
 [[nodiscard]] const CMPIInstance* completed(const Request& request, const ServedClass& served,
-                                            const Object& object, const char** properties);
+                                            const CMPIInstance* instance, const char** properties);
 
 }  // namespace ZR::DHCPClientGateway

@@ -16,15 +16,15 @@ class Delivery {
 
     [[nodiscard]] Form form() const noexcept { return form_; }
 
-    /// An object manager that has given up on the request refuses: the walks are short
-    /// enough to end by themselves. Throws Refusal.
+    /// Of a name the path counts, of an instance just that. An object manager that has given up on
+    /// the request refuses: the walks are short enough to end by themselves. Throws Refusal.
     void give(const ServedClass& served, const Object& object) const {
         const CMPIResult* result = request_.result;
         if (form_ == Form::names) {
             static_cast<void>(result->ft->returnObjectPath(result, object.path));
         } else {
             static_cast<void>(result->ft->returnInstance(
-                result, completed(request_, served, object, properties_)));
+                result, completed(request_, served, object.instance, properties_)));
         }
     }
 

@@ -16,9 +16,10 @@ void enumerateTo(const Request& request, const ServedClass& served, const Delive
         }
         return;
     }
-    for (const Object& object : ask(request, served, delivery.form())) {
-        delivery.give(served, object);
-    }
+    askEach(request, served, delivery.form(), {},
+            [&](const CMPIObjectPath* path, const CMPIInstance* instance) {
+                delivery.give(served, {path, instance, {}});
+            });
 }
 
 }  // namespace

@@ -1,8 +1,8 @@
 #include "Providers.h"
 
 #include <atomic>
+#include <utility>
 
-#include "Collector.h"
 #include "Refusal.h"
 #include "providerutilities/ProviderUtilities.h"
 
@@ -20,12 +20,6 @@ void requireSuccess(const CMPIStatus& status, const char* className) {
 
 const CMPIObjectPath* pathOf(const CMPIInstance* instance) {
     return instance == nullptr ? nullptr : instance->ft->getObjectPath(instance, nullptr);
-}
-
-void keep(std::vector<Object>& objects, const CMPIObjectPath* path, const CMPIInstance* instance) {
-    if (path != nullptr) {
-        objects.push_back({path, instance, Keys(path)});
-    }
 }
 
 /// An object of another provider by a path of the request's own: one that comes from the
@@ -53,30 +47,33 @@ void useExactProvider(CMPIInstanceMI* provider) noexcept {
     exactProvider = provider;
 }
 
-std::vector<Object> ask(const Request& request, const ServedClass& served, Form form,
-                        const KeyTexts& narrowing) {
-    Collector collector;
+void askEach(const Request& request, const ServedClass& served, Form form,
+             const KeyTexts& narrowing, Collector::Take take) {
+    const Collector collector(std::move(take));
     CMPIInstanceMI* provider = exactProvider;
     const CMPIObjectPath* path =
         makePath(request, served.name, served.narrows ? narrowing : KeyTexts{});
+    const CMPIStatus status =
+        form == Form::names ? provider->ft->enumerateInstanceNames(provider, request.context,
+                                                                   collector.record(), path)
+                            : provider->ft->enumerateInstances(provider, request.context,
+                                                               collector.record(), path, nullptr);
+    collector.rethrow();
+    requireSuccess(status, served.name);
+}
+
+std::vector<Object> ask(const Request& request, const ServedClass& served, Form form,
+                        const KeyTexts& narrowing) {
     std::vector<Object> objects;
-    if (form == Form::names) {
-        requireSuccess(provider->ft->enumerateInstanceNames(provider, request.context,
-                                                            collector.record(), path),
-                       served.name);
-        objects.reserve(collector.paths().size());
-        for (const CMPIObjectPath* each : collector.paths()) {
-            keep(objects, each, nullptr);
-        }
-    } else {
-        requireSuccess(provider->ft->enumerateInstances(provider, request.context,
-                                                        collector.record(), path, nullptr),
-                       served.name);
-        objects.reserve(collector.instances().size());
-        for (const CMPIInstance* each : collector.instances()) {
-            keep(objects, pathOf(each), each);
-        }
-    }
+    askEach(request, served, form, narrowing,
+            [&objects](const CMPIObjectPath* path, const CMPIInstance* instance) {
+                if (path == nullptr) {
+                    path = pathOf(instance);
+                }
+                if (path != nullptr) {
+                    objects.push_back({path, instance, Keys(path)});
+                }
+            });
     return objects;
 }
 
@@ -109,7 +106,8 @@ std::optional<Object> askOthersFor(const Request& request, const ServedClass& se
 }
 
 void modify(const Request& request, const CMPIObjectPath* path, const CMPIInstance* instance) {
-    Collector collector;
+    // It hands nothing over.
+    const Collector collector([](const CMPIObjectPath*, const CMPIInstance*) {});
     CMPIInstanceMI* provider = exactProvider;
     requireSuccess(provider->ft->modifyInstance(provider, request.context, collector.record(), path,
                                                 instance, nullptr),

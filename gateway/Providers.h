@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "Classes.h"
+#include "Collector.h"
 #include "Keys.h"
 
 namespace ZR::DHCPClientGateway {
@@ -35,8 +36,13 @@ struct Object {
 /// Whether requests want names or whole instances.
 enum class Form { names, instances };
 
-/// What the exact provider has of a class, in its order; with keys just what they name,
-/// where it narrows by keys. Throws Refusal when it refuses.
+/// Hands on what the exact provider has of a class, in its order, one after the other; with
+/// keys just what they name, where it narrows by keys. Throws Refusal when it refuses, and
+/// what `take` throws.
+void askEach(const Request& request, const ServedClass& served, Form form,
+             const KeyTexts& narrowing, Collector::Take take);
+
+/// The same, all of it.
 [[nodiscard]] std::vector<Object> ask(const Request& request, const ServedClass& served, Form form,
                                       const KeyTexts& narrowing = {});
 

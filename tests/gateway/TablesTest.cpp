@@ -80,6 +80,17 @@ TEST_P(TablesTest, HaveTheProperties) {
     EXPECT_EQ(known, declared);
 }
 
+/// The schema of the classes takes back the defaults of their parents, where there are any.
+TEST_P(TablesTest, HaveTheDefaultsOfTheStandardSchema) {
+    for (const Property& each : served_.properties) {
+        const cimom::PropertyDeclaration& property = *declaration_.property(each.name);
+        const bool overridden = !property.propagated && property.classOrigin != served_.name &&
+                                property.type != cimom::Type::reference &&
+                                (served_.writable == nullptr || property.name != served_.writable);
+        EXPECT_EQ(each.hasDefault, overridden) << each.name;
+    }
+}
+
 TEST_P(TablesTest, KnowWhatCanBeWritten) {
     const cimom::PropertyDeclaration* writable = nullptr;
     for (const cimom::PropertyDeclaration& each : declaration_.properties) {

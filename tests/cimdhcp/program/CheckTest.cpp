@@ -36,9 +36,8 @@ TEST_F(Check, OnAGoodMachineEverythingIsInOrder) {
                 HasSubstr("ok    settings: " + (directory() / "platform.conf") + " is read\n"));
     EXPECT_THAT(ended.out, HasSubstr("ok    machine: tree " + tree() +
                                      " has 2 interfaces, 1 of them with DHCP\n"));
-    EXPECT_THAT(ended.out, HasSubstr("ok    instance factory: of provider DHCPClientProvider\n"));
-    EXPECT_THAT(ended.out,
-                HasSubstr("ok    association factory: of provider DHCPClientProvider\n"));
+    EXPECT_THAT(ended.out, HasSubstr("ok    instance factory: of provider DHCPClientGateway\n"));
+    EXPECT_THAT(ended.out, HasSubstr("ok    association factory: of provider DHCPClientGateway\n"));
     EXPECT_THAT(ended.out, HasSubstr("ok    QVXZR_DHCPProtocolEndpoint: 1 instance\n"));
     EXPECT_THAT(ended.out, HasSubstr("ok    QVXZR_DHCPSettingData: 2 instances\n"));
     EXPECT_THAT(ended.out, Not(HasSubstr("BAD")));

@@ -337,12 +337,12 @@ TEST_F(OverviewCommands, ClassesListsWhatIsServed) {
     EXPECT_TRUE(has({{"class", "QVXZR_DHCPSettingData"},
                      {"superclass", "CIM_DHCPSettingData"},
                      {"kind", "element"},
-                     {"provider", "DHCPClientProvider"},
+                     {"provider", "DHCPClientGateway"},
                      {"namespaces", {"root/cimv2"}}}));
     EXPECT_TRUE(has({{"class", "QVXZR_DHCPOrderedComponent"},
                      {"superclass", "CIM_OrderedComponent"},
                      {"kind", "association"},
-                     {"provider", "DHCPClientProvider"},
+                     {"provider", "DHCPClientGateway"},
                      {"namespaces", {"root/cimv2"}}}));
     for (const auto& entry : json) {
         EXPECT_NE(ended.out.find('\n' + entry["class"].get<std::string>() + ' '),

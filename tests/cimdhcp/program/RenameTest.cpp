@@ -219,11 +219,11 @@ TEST_F(Rename, EndsALastLineThatHasNoEnd) {
 TEST_F(Rename, FindsOutThatItDidNotTakeEffect) {
     // The exact provider returns OK all the same.
     fs::create_directory(configuration("eth0"));
-    EXPECT_EQ(run({"rename", "eth0", "office"}),
-              (Ended{1, "",
-                     "cimdhcp: CIM_ERR_FAILED: " + configuration("eth0") +
-                         " is not a regular file; " + configuration("eth0") +
-                         " cannot be read (Is a directory)\n"}));
+    EXPECT_EQ(
+        run({"rename", "eth0", "office"}),
+        (Ended{1, "",
+               "cimdhcp: CIM_ERR_FAILED: " + configuration("eth0") + " is not a regular file; " +
+                   configuration("eth0") + " cannot be read (Is a directory)\n"}));
     EXPECT_EQ(run({"--exact", "rename", "eth0", "office"}),
               (Ended{1, "",
                      "cimdhcp: the configuration name of eth0 is still \"\": " +
@@ -243,11 +243,10 @@ TEST_F(Rename, TellsWhatTheFileHoldsAfterAFailure) {
         runAs("/usr/bin/setpriv",
               {"--reuid=65534", "--regid=65534", "--clear-groups", program(), "--tree", tree(),
                "--data-dir", dataDir(), "rename", "eth0", "office"});
-    EXPECT_EQ(ended,
-              (Ended{1, "",
-                     "cimdhcp: CIM_ERR_ACCESS_DENIED: " + configuration("eth0") +
-                         " cannot be written: Permission denied; " +
-                         configuration("eth0") + " now holds CONFIG_NAME=home in line 2\n"}));
+    EXPECT_EQ(ended, (Ended{1, "",
+                            "cimdhcp: CIM_ERR_ACCESS_DENIED: " + configuration("eth0") +
+                                " cannot be written: Permission denied; " + configuration("eth0") +
+                                " now holds CONFIG_NAME=home in line 2\n"}));
 }
 
 TEST_F(Rename, RefusesInterfacesThatCannotHaveAFile) {

@@ -133,9 +133,8 @@ TEST_F(Wbemcli, AnEmptyMachine) {
     serve(0);
     expectEnumerations();
     const std::string gone = "QVXZR_DHCPSettingData.InstanceID=\"Computer%if0\"";
-    const Ended missing{16, "",
-                        "*\n* /usr/bin/wbemcli: Cim: (6) CIM_ERR_NOT_FOUND: there is no " + gone +
-                            "\n*\n"};
+    const Ended missing{
+        16, "", "*\n* /usr/bin/wbemcli: Cim: (6) CIM_ERR_NOT_FOUND: there is no " + gone + "\n*\n"};
     for (const char* verb : {"ain", "ai", "rin", "ri", "gi"}) {
         EXPECT_EQ(ask(verb, gone), missing) << verb;
     }
