@@ -102,7 +102,26 @@ bool lists(const char** properties, const std::string& name) {
     return false;
 }
 
-/// Null when the broker refuses any part of it.
+/// Sets one property to the null of its type.
+struct NullSetter {
+    CMPIInstance* instance;
+    const char* name;
+
+    bool operator()(const std::string& /*text*/) const { return set(CMPI_string); }
+    bool operator()(std::monostate /*null*/) const { return set(CMPI_uint16); }
+    bool operator()(unsigned short /*number*/) const { return set(CMPI_uint16); }
+    bool operator()(const std::vector<unsigned short>& /*numbers*/) const {
+        return set(CMPI_uint16A);
+    }
+
+  private:
+    [[nodiscard]] bool set(CMPIType type) const {
+        return ProviderUtilities::setNull(instance, name, type);
+    }
+};
+
+/// Null when the broker refuses any part of it. What a property list leaves out is set to
+/// null: unset, some object managers show the default of the schema.
 CMPIInstance* makeInstance(const NeighbourObject& object, const std::string& nameSpace,
                            const char** properties) {
     CMPIInstance* instance = ProviderUtilities::createInstance(broker, makePath(object, nameSpace));
@@ -113,9 +132,9 @@ CMPIInstance* makeInstance(const NeighbourObject& object, const std::string& nam
         }
     }
     for (const auto& [name, value] : object.properties) {
-        if (lists(properties, name)) {
-            complete = complete && std::visit(PropertySetter{instance, name.c_str()}, value);
-        }
+        complete = complete && (lists(properties, name)
+                                    ? std::visit(PropertySetter{instance, name.c_str()}, value)
+                                    : std::visit(NullSetter{instance, name.c_str()}, value));
     }
     return complete ? instance : nullptr;
 }

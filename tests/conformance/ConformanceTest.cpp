@@ -6,6 +6,8 @@
 #include <algorithm>
 #include <cctype>
 #include <memory>
+#include <optional>
+#include <stdexcept>
 
 #include "Hosts.h"
 #include "Model.h"
@@ -123,8 +125,8 @@ class ConformanceTest : public test::TreeTest, public ::testing::WithParamInterf
         EXPECT_THAT(strict::violations().take(), IsEmpty());
     }
 
-    /// The response, without the properties that a host adds to those of a list: defaults of
-    /// its schema, and the references without which it tells its client nothing.
+    /// The response; what an object manager leaves out by a property list itself is left out
+    /// here: the references without which some have nothing for their clients.
     Response ask(const Request& request) const {
         Response response = host_->ask(request);
         if (!GetParam().isBare || !request.properties) {
@@ -132,8 +134,7 @@ class ConformanceTest : public test::TreeTest, public ::testing::WithParamInterf
         }
         for (cimom::Instance& instance : response.instances) {
             std::erase_if(instance.properties, [&](const cimom::NamedValue& property) {
-                const bool isReference = property.value.type == cimom::Type::reference;
-                return (isReference || GetParam().addsDefaults) &&
+                return property.value.type == cimom::Type::reference &&
                        std::find(request.properties->begin(), request.properties->end(),
                                  property.name) == request.properties->end();
             });
@@ -400,6 +401,104 @@ TEST_P(ConformanceTest, AnAssociationIsTheEndOfNone) {
     }
 }
 
+// Changes.
+
+class ModificationTest : public ConformanceTest {
+  protected:
+    static cimom::NamedValue text(const std::string& name, const std::string& value) {
+        return {name, cimom::Value::ofString(value)};
+    }
+
+    /// The settings of an interface, with these properties alone.
+    cimom::Instance setting(const std::string& interface,
+                            std::vector<cimom::NamedValue> properties) const {
+        for (const cimom::Instance& each : model_.objects()) {
+            if (each.path.className == "QVXZR_DHCPSettingData" &&
+                *each.property("ElementName") == cimom::Value::ofString(interface)) {
+                return {each.path, std::move(properties)};
+            }
+        }
+        throw std::logic_error("no such interface");
+    }
+
+    void expectModified(const cimom::Instance& instance,
+                        const std::optional<Texts>& properties = std::nullopt) const {
+        const Response response = host_->modify(instance, properties);
+        EXPECT_EQ(response.code, CMPI_RC_OK) << textOf(instance) << '\n' << response.message;
+    }
+
+    void expectRefusal(const cimom::Instance& instance, CMPIrc code,
+                       const std::optional<Texts>& properties = std::nullopt) const {
+        const Response response = host_->modify(instance, properties);
+        EXPECT_EQ(response.code, code) << textOf(instance) << '\n' << response.message;
+        EXPECT_THAT(response.message, Not(IsEmpty())) << textOf(instance);
+    }
+
+    /// That the settings of all interfaces are as they were, but for the configuration that
+    /// eth0 has.
+    void expectConfiguration(const std::string& name) const {
+        const Request request{.operation = Operation::enumerate,
+                              .path = classPath("QVXZR_DHCPSettingData")};
+        Response expected = model_.responseTo(request);
+        for (cimom::Instance& each : expected.instances) {
+            for (cimom::NamedValue& property : each.properties) {
+                if (property.name == "ConfigurationName") {
+                    property.value = cimom::Value::ofString(name);
+                }
+            }
+        }
+        EXPECT_EQ(textsOf(ask(request)), textsOf(expected));
+    }
+};
+
+TEST_P(ModificationTest, ThePropertyListSaysWhatChanges) {
+    const cimom::NamedValue next = text("ConfigurationName", "home");
+    expectModified(setting("eth0", {next}), Texts{});
+    expectConfiguration("office");
+    expectModified(setting("eth0", {next, text("ElementName", "eth0")}), Texts{"ElementName"});
+    expectConfiguration("office");
+    expectModified(setting("eth0", {next, text("ElementName", "other")}),
+                   Texts{"CONFIGURATIONNAME"});
+    expectConfiguration("home");
+    expectModified(setting("eth0", {text("ConfigurationName", "third")}));
+    expectConfiguration("third");
+    expectModified(setting("eth0", {text("ElementName", "eth0")}));
+    expectConfiguration("third");
+    // All that it has, as clients send that have read it before.
+    cimom::Instance whole = setting("eth0", {});
+    whole.properties =
+        ask({.operation = Operation::get, .path = whole.path}).instances.at(0).properties;
+    expectModified(whole);
+    expectConfiguration("third");
+}
+
+TEST_P(ModificationTest, WhatCannotChangeIsRefused) {
+    expectRefusal(
+        setting("eth0", {text("ConfigurationName", "home"), text("ElementName", "other")}),
+        CMPI_RC_ERR_NOT_SUPPORTED);
+    expectRefusal(setting("eth0", {text("ConfigurationName", "home")}),
+                  CMPI_RC_ERR_NO_SUCH_PROPERTY, Texts{"ConfigurationName", "NoSuchProperty"});
+    // Some object managers do not let it through.
+    expectRefusal(setting("eth0", {text("ConfigurationName", "two\nlines")}),
+                  GetParam().isBare ? CMPI_RC_ERR_FAILED : CMPI_RC_ERR_INVALID_PARAMETER);
+    // It has no file.
+    expectRefusal(setting("my_nic", {text("ConfigurationName", "home")}), CMPI_RC_ERR_FAILED);
+    expectConfiguration("office");
+    for (const cimom::Instance& each : model_.objects()) {
+        expectRefusal({each.path, {text("ElementName", "other")}}, CMPI_RC_ERR_NOT_SUPPORTED);
+    }
+}
+
+TEST_P(ModificationTest, InstancesThatAreNotThereAreNotFound) {
+    cimom::Instance nothing = setting("eth0", {text("ConfigurationName", "home")});
+    nothing.path = withOther(nothing.path, 0);
+    expectRefusal(nothing, CMPI_RC_ERR_NOT_FOUND);
+    expectRefusal(nothing, CMPI_RC_ERR_NOT_FOUND, Texts{});
+    nothing.path.keys.clear();
+    expectRefusal(nothing, CMPI_RC_ERR_INVALID_PARAMETER);
+    expectConfiguration("office");
+}
+
 // What a host lets through.
 
 TEST_P(ConformanceTest, UnknownNamesHaveOneResponse) {
@@ -443,6 +542,8 @@ TEST_P(ConformanceTest, SourcesOfOtherClassesHaveNoAssociations) {
     }
 }
 
+INSTANTIATE_TEST_SUITE_P(In, ModificationTest, ::testing::ValuesIn(conformance::hostKinds()),
+                         [](const auto& each) { return each.param.name; });
 INSTANTIATE_TEST_SUITE_P(In, ConformanceTest, ::testing::ValuesIn(conformance::hostKinds()),
                          [](const auto& each) { return each.param.name; });
 

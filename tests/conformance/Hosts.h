@@ -2,6 +2,7 @@
 
 #include <functional>
 #include <memory>
+#include <optional>
 #include <ostream>
 #include <string>
 #include <vector>
@@ -19,15 +20,15 @@ class Host {
     Host& operator=(const Host&) = delete;
 
     virtual Response ask(const Request& request) = 0;
+    /// Without a list, all properties of the instance are meant.
+    virtual Response modify(const cimom::Instance& instance,
+                            const std::optional<Texts>& properties) = 0;
 };
 
 /// A kind of object manager. One at a time: the library knows one broker.
 struct HostKind {
     std::string name;
     std::function<std::unique_ptr<Host>()> make;
-    /// Whether it adds defaults of its schema to instances, whatever properties were asked
-    /// for.
-    bool addsDefaults = false;
     /// Whether nothing stands between clients and providers, so that the responses to
     /// requests that name unknown things are the providers'.
     bool isBare = false;

@@ -10,6 +10,7 @@
 
 #include "cimom/Names.h"
 #include "kit/StrictBroker.h"
+#include "kit/StrictValues.h"
 
 namespace strict {
 
@@ -264,7 +265,11 @@ StrictHost::Response StrictHost::create(const cimom::Instance& instance) {
                    });
 }
 
-StrictHost::Response StrictHost::modify(const cimom::Instance& instance, const char** properties) {
+StrictHost::Response StrictHost::modify(const cimom::Instance& modified, const char** properties) {
+    cimom::Instance instance = modified;
+    if (traits_.filledModifications && properties == nullptr) {
+        instance = withDefaults(repository_, std::move(instance), Defaults::inherited);
+    }
     return ofClass(Kind::nothing, instance.path,
                    [&](auto* mi, auto* context, auto* result, auto* op) {
                        return callSlot("modifyInstance", mi->ft->modifyInstance, mi, context,

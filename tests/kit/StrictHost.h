@@ -59,7 +59,7 @@ class StrictHost {
     Response enumerate(const cimom::ObjectPath& path, const char** properties = nullptr);
     Response get(const cimom::ObjectPath& path, const char** properties = nullptr);
     Response create(const cimom::Instance& instance);
-    Response modify(const cimom::Instance& instance, const char** properties = nullptr);
+    Response modify(const cimom::Instance& modified, const char** properties = nullptr);
     Response remove(const cimom::ObjectPath& path);
     Response query(const cimom::ObjectPath& path, const char* text, const char* language);
 

@@ -361,7 +361,9 @@ CMPIStatus returnInstance(const CMPIResult* result, const CMPIInstance* instance
         violations().add("returnInstance responds to a request that is not for instances");
     }
     checkDelivered(*object->repository, delivered->model);
-    object->instances.push_back(withDefaults(*object->repository, delivered->model));
+    object->instances.push_back(withDefaults(
+        *object->repository, delivered->model,
+        RequestObjects::traits().parentsDefaults ? Defaults::inherited : Defaults::declared));
     return {CMPI_RC_OK, nullptr};
 }
 

@@ -10,8 +10,11 @@ struct Traits {
     /// with the null state; asked for one of them by name, the path reads out of bounds.
     bool declaredKeys = false;
     /// `= NULL` in a MOF is no initialiser: a property that stays unset shows the default
-    /// that the nearest superclass declares.
+    /// that the topmost superclass with one declares.
     bool parentsDefaults = false;
+    /// An instance to modify shows those defaults for what the client did not send, unless
+    /// it sent a property list.
+    bool filledModifications = false;
     /// The response to GetInstance is the first instance that the provider hands over.
     bool firstInstance = false;
     /// The broker tells the version of the standard, where others tell 0.
@@ -32,6 +35,7 @@ inline constexpr std::array namedTraits{
     NamedTraits{"Plain", {}},
     NamedTraits{"DeclaredKeys", {.declaredKeys = true}},
     NamedTraits{"ParentsDefaults", {.parentsDefaults = true}},
+    NamedTraits{"FilledModifications", {.filledModifications = true}},
     NamedTraits{"FirstInstance", {.firstInstance = true}},
     NamedTraits{"TellsItsVersion", {.tellsItsVersion = true}},
     NamedTraits{"LateBinding", {.lateBinding = true}},

@@ -185,29 +185,32 @@ void checkDelivered(const cimom::ClassRepository& repository, const cimom::Insta
 
 namespace {
 
+/// Null when there is none.
 const cimom::Value* defaultOf(const cimom::ClassRepository& repository,
-                              const cimom::ClassDeclaration& declaration, const std::string& name) {
+                              const cimom::ClassDeclaration& declaration, const std::string& name,
+                              Defaults defaults) {
+    if (defaults == Defaults::inherited && !declaration.superclass.empty()) {
+        const cimom::ClassDeclaration* parent = repository.find(declaration.superclass);
+        const cimom::Value* above =
+            parent == nullptr ? nullptr : defaultOf(repository, *parent, name, defaults);
+        if (above != nullptr) {
+            return above;
+        }
+    }
     const cimom::PropertyDeclaration* property = declaration.property(name);
-    if (property == nullptr) {
-        return nullptr;
-    }
-    if (!property->defaultValue.isNull()) {
-        return &property->defaultValue;
-    }
-    const cimom::ClassDeclaration* parent =
-        RequestObjects::traits().parentsDefaults && !declaration.superclass.empty()
-            ? repository.find(declaration.superclass)
-            : nullptr;
-    return parent == nullptr ? nullptr : defaultOf(repository, *parent, name);
+    return property == nullptr || property->defaultValue.isNull() ? nullptr
+                                                                  : &property->defaultValue;
 }
 
 }  // namespace
 
-cimom::Instance withDefaults(const cimom::ClassRepository& repository, cimom::Instance instance) {
+cimom::Instance withDefaults(const cimom::ClassRepository& repository, cimom::Instance instance,
+                             Defaults defaults) {
     const cimom::ClassDeclaration* declaration = repository.find(instance.path.className);
     if (declaration != nullptr) {
         for (const cimom::PropertyDeclaration& property : declaration->properties) {
-            const cimom::Value* shown = defaultOf(repository, *declaration, property.name);
+            const cimom::Value* shown =
+                defaultOf(repository, *declaration, property.name, defaults);
             if (shown != nullptr && instance.property(property.name) == nullptr) {
                 instance.properties.push_back({property.name, *shown});
             }

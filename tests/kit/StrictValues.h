@@ -36,8 +36,11 @@ bool hasType(const cimom::ClassRepository& repository, const std::string& classN
 void checkDelivered(const cimom::ClassRepository& repository, const cimom::ObjectPath& path);
 void checkDelivered(const cimom::ClassRepository& repository, const cimom::Instance& instance);
 
-/// The instance as a client sees it: an unset property shows its declared default, in
-/// some hosts the nearest superclass' where the class declares null.
-cimom::Instance withDefaults(const cimom::ClassRepository& repository, cimom::Instance instance);
+/// Whose default counts: that of the class, or that of the topmost superclass that has one.
+enum class Defaults { declared, inherited };
+
+/// The instance with the default in place of each property that is unset.
+cimom::Instance withDefaults(const cimom::ClassRepository& repository, cimom::Instance instance,
+                             Defaults defaults);
 
 }  // namespace strict

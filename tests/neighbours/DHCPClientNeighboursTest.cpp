@@ -284,9 +284,12 @@ TEST_F(NeighboursTest, GetGivesThePropertiesOfTheList) {
     const std::string path = R"(QVXZR_IPAssignmentSettingData.InstanceID="Computer%eth1%dhcp")";
     const Response response = get(path, some);
     ASSERT_EQ(response.instances.size(), 1U);
-    EXPECT_THAT(propertiesOf(response.instances[0]), ElementsAre("ElementName=eth1"));
+    // A null stays in place of a default of the schema.
+    EXPECT_THAT(propertiesOf(response.instances[0]),
+                ElementsAre("ElementName=eth1", "AddressOrigin=null"));
     const char* none[] = {nullptr};
-    EXPECT_THAT(propertiesOf(get(path, none).instances.at(0)), IsEmpty());
+    EXPECT_THAT(propertiesOf(get(path, none).instances.at(0)),
+                ElementsAre("ElementName=null", "AddressOrigin=null"));
 }
 
 TEST_F(NeighboursTest, GetWantsTheKeysOfTheClassAndNoOthers) {
