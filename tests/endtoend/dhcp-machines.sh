@@ -137,6 +137,7 @@ static() {
     set_by_hand 198.51.100.30
     write_in_client /etc/dhcpcd.conf <<<$'ipv4only\nnoipv4ll\nnohook resolv.conf\ndenyinterfaces eth1'
     in_client dhcpcd -b --nodev </dev/null >>"$work/client.log" 2>&1
+    eventually is_running dhcpcd || fail "no dhcpcd: $(<"$work/client.log")"
     by_hand "a link that dhcpcd is denied"
     kill_processes KILL dhcpcd
     in_client rm -rf /run/dhcpcd

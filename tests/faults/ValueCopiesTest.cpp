@@ -8,14 +8,13 @@
 #include <string>
 #include <vector>
 
-#include "LinuxSupport.h"
 #include "Precedence.h"
 #include "kit/Allocations.h"
 
 namespace test {
 namespace {
 
-using ZR::Live::operator""_ip;
+using ZR::Live::IpAddress;
 using ZR::Testing::Allocations;
 using ZR::Testing::CallOrigin;
 
@@ -44,7 +43,8 @@ unsigned copyWithFailures(const Value& value) {
 }
 
 TEST(ValueCopies, OfThePrecedenceTableSurviveFailures) {
-    const ZR::Live::AddressList list{{"192.0.2.1"_ip, "2001:db8::1"_ip}};
+    const ZR::Live::AddressList list{{IpAddress::ipv4FromText("192.0.2.1").value(),
+                                      IpAddress::ipv4FromText("192.0.2.2").value()}};
     EXPECT_GT(copyWithFailures(ZR::Live::FoundValue{list}), 0U);
     EXPECT_EQ(copyWithFailures(ZR::Live::FoundValue{true}), 0U);
 }

@@ -45,6 +45,11 @@ class RandomFacts {
         repeat(facts.clients.sockets.bound,
                [this] { return PortSocket{.address = maybe(ip4()), .peer = maybe(ip4())}; });
         repeat(facts.clients.sockets.packetLinks, [this] { return 1 + below(3); });
+        if (below(3) == 0) {
+            constexpr std::array managers{Client::Networkd, Client::NetworkManager,
+                                          Client::Connman};
+            repeat(facts.clients.unheardManagers, [&] { return oneOf(managers); });
+        }
         if (below(8) == 0) {
             facts.clients.boot = {.bootp = flip(), .server = maybe(ip4()), .origin = "pnp"};
         }
