@@ -65,33 +65,41 @@ bool mayGive(const Request& request, const End& end, const char* resultClass) {
     });
 }
 
-/// The source of the request; nothing when there is nothing to look for.
-std::optional<Object> sourceOf(const Request& request, const ServedClass* served,
-                               const std::vector<Part>& parts) {
-    return served == nullptr || parts.empty() ? std::nullopt
-                                              : std::optional(find(request, *served, Form::names));
+/// What the request is about; nothing for an object of a class that is at no end. It is
+/// looked for whatever the filter: some object managers ask once for each association
+/// class, and a source that is not there is to have one response.
+struct Source {
+    const ServedClass* served;
+    Object object;
+};
+
+std::optional<Source> sourceOf(const Request& request) {
+    const ServedClass* served = findClass(classNameOf(request.path));
+    if (served == nullptr || served->server == Server::gateway) {
+        return std::nullopt;
+    }
+    return Source{served, find(request, *served, Form::names)};
 }
 
 }  // namespace
 
 void associators(const Request& request, const AssociationFilter& filter,
                  const Delivery& delivery) {
-    const ServedClass* served = findClass(classNameOf(request.path));
-    std::vector<Part> parts;
-    if (served != nullptr) {
-        parts = partsOf(request, *served, filter);
-        std::erase_if(parts, [&](const Part& part) {
-            return !mayGive(request, part.association->ends.at(1 - part.near), filter.resultClass);
-        });
+    const std::optional<Source> source = sourceOf(request);
+    if (!source) {
+        return;
     }
-    const std::optional<Object> source = sourceOf(request, served, parts);
-    for (const Part& part : parts) {
-        for (const Object& object :
-             linked(request, *part.association, 1 - part.near, source->keys, delivery.form())) {
+    for (const Part& part : partsOf(request, *source->served, filter)) {
+        const End& end = part.association->ends.at(1 - part.near);
+        if (!mayGive(request, end, filter.resultClass)) {
+            continue;
+        }
+        for (const Object& object : linked(request, *part.association, 1 - part.near,
+                                           source->object.keys, delivery.form())) {
             const ServedClass* far = findClass(classNameOf(object.path));
             // Another provider may give objects of a class of its own.
             if (far == nullptr) {
-                far = findClass(part.association->ends.at(1 - part.near).classes.front());
+                far = findClass(end.classes.front());
             }
             if (acceptsClass(request, filter.resultClass, *far)) {
                 delivery.give(*far, object);
@@ -101,12 +109,12 @@ void associators(const Request& request, const AssociationFilter& filter,
 }
 
 void references(const Request& request, const AssociationFilter& filter, const Delivery& delivery) {
-    const ServedClass* served = findClass(classNameOf(request.path));
-    const std::vector<Part> parts =
-        served == nullptr ? std::vector<Part>{} : partsOf(request, *served, filter);
-    const std::optional<Object> source = sourceOf(request, served, parts);
-    for (const Part& part : parts) {
-        for (const Link& link : linksOf(request, *part.association, part.near, *source)) {
+    const std::optional<Source> source = sourceOf(request);
+    if (!source) {
+        return;
+    }
+    for (const Part& part : partsOf(request, *source->served, filter)) {
+        for (const Link& link : linksOf(request, *part.association, part.near, source->object)) {
             delivery.give(*findClass(part.association->name),
                           objectOf(request, link, delivery.form()));
         }

@@ -4,7 +4,7 @@ _cimdhcp() {
     local word=${COMP_WORDS[COMP_CWORD]} before=${COMP_WORDS[COMP_CWORD - 1]}
     local options='--tree --data-dir --namespace --format --connect --hosts --parallel --timeout
         --credentials --cacert --insecure --no-header --sort --count --time --color --schema-dir
-        --registration-dir --provider-dir --exact --version --help'
+        --registration-dir --provider-dir --cim-schema --exact --version --help'
     local commands='show rename graph tree check classes names instances get modify associators
         references serve user'
     # What the program is asked for completions with: the same servers, if there are any.
@@ -64,6 +64,10 @@ _cimdhcp() {
             ;;
         --tree)
             mapfile -t COMPREPLY < <(compgen -o plusdirs -f -X '!*.json' -- "$word")
+            return
+            ;;
+        --cim-schema)
+            mapfile -t COMPREPLY < <(compgen -o plusdirs -f -X '!*.mof' -- "$word")
             return
             ;;
         --data-dir | --schema-dir | --registration-dir | --provider-dir)

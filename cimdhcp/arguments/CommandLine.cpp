@@ -233,19 +233,28 @@ class CommandLineReader::Parser {
             });
         addRemoteOptions(app_, line_.options);
         addOutputOptions(app_, line_.options);
-        app_.add_option("--schema-dir", line_.options.schemaDir, "Directory of the *.mof files")
+        app_.add_option("--schema-dir", line_.options.directories.schemaDir,
+                        "Directory of the *.mof files")
             ->type_name("DIR")
             ->envname("CIMDHCP_SCHEMA_DIR")
             ->group(advancedGroup);
-        app_.add_option("--registration-dir", line_.options.registrationDir,
+        app_.add_option("--registration-dir", line_.options.directories.registrationDir,
                         "Directory of the *.registration files")
             ->type_name("DIR")
             ->envname("CIMDHCP_REGISTRATION_DIR")
             ->group(advancedGroup);
-        app_.add_option("--provider-dir", line_.options.providerDir,
-                        "Directory of the provider libraries")
+        app_.add_option("--provider-dir", line_.options.directories.providerDirs,
+                        "Directory of provider libraries; may be repeated")
             ->type_name("DIR")
+            ->expected(1)
+            ->allow_extra_args(false)
+            ->multi_option_policy(CLI::MultiOptionPolicy::TakeAll)
             ->envname("CIMDHCP_PROVIDER_DIR")
+            ->group(advancedGroup);
+        app_.add_option("--cim-schema", line_.options.directories.cimSchema,
+                        "A whole CIM schema in place of the reduced one")
+            ->type_name("PATH")
+            ->envname("CIMDHCP_CIM_SCHEMA")
             ->group(advancedGroup);
         app_.add_flag("--exact", line_.options.exact,
                       "The exact provider, not the gateway before it")

@@ -12,15 +12,23 @@
 
 namespace cimdhcp {
 
+/// Where the schema, the registrations and the providers are, if not in the installation.
+struct DirectoryOptions {
+    std::optional<std::string> schemaDir;
+    std::optional<std::string> registrationDir;
+    std::vector<std::string> providerDirs;  ///< searched in this order
+    std::optional<std::string> cimSchema;   ///< a whole CIM schema: its file or directory
+
+    bool operator==(const DirectoryOptions&) const = default;
+};
+
 /// What holds for every command.
 struct Options {
     std::optional<std::string> tree;     ///< a JSON tree in place of the live machine
     std::optional<std::string> dataDir;  ///< where the ifcfg- files are
     std::string nameSpace = "root/cimv2";
     Format format = Format::table;
-    std::optional<std::string> schemaDir;
-    std::optional<std::string> registrationDir;
-    std::optional<std::string> providerDir;
+    DirectoryOptions directories;
     bool exact = false;  ///< the exact provider, without the gateway in front of it
 
     // The servers that are asked in place of the object manager of this process.

@@ -29,7 +29,7 @@ Directories findDirectories(const Options& options, const std::vector<Directorie
     Directories result;
     if (found != installations.end()) {
         result = *found;
-    } else if (!options.schemaDir || !options.providerDir) {
+    } else if (!options.directories.schemaDir || options.directories.providerDirs.empty()) {
         std::string places;
         for (const Directories& place : installations) {
             places += (places.empty() ? "" : ", ") + place.schema.string();
@@ -38,22 +38,28 @@ Directories findDirectories(const Options& options, const std::vector<Directorie
                       "no schema found in " + places +
                           "; --schema-dir and --provider-dir can name where they are");
     }
-    if (options.schemaDir) {
-        requireDirectory(*options.schemaDir, "--schema-dir", "CIMDHCP_SCHEMA_DIR");
+    if (options.directories.schemaDir) {
+        requireDirectory(*options.directories.schemaDir, "--schema-dir", "CIMDHCP_SCHEMA_DIR");
         // The registrations lie beside the schema if nothing else is said.
-        result.schema = result.registrations = *options.schemaDir;
+        result.schema = result.registrations = *options.directories.schemaDir;
     }
-    if (options.registrationDir) {
-        requireDirectory(*options.registrationDir, "--registration-dir",
+    if (options.directories.registrationDir) {
+        requireDirectory(*options.directories.registrationDir, "--registration-dir",
                          "CIMDHCP_REGISTRATION_DIR");
-        result.registrations = *options.registrationDir;
+        result.registrations = *options.directories.registrationDir;
     }
     if (options.exact) {
         result.registrations /= "exact";
     }
-    if (options.providerDir) {
-        requireDirectory(*options.providerDir, "--provider-dir", "CIMDHCP_PROVIDER_DIR");
-        result.providers = {*options.providerDir};
+    if (!options.directories.providerDirs.empty()) {
+        result.providers.clear();
+        for (const std::string& directory : options.directories.providerDirs) {
+            requireDirectory(directory, "--provider-dir", "CIMDHCP_PROVIDER_DIR");
+            result.providers.emplace_back(directory);
+        }
+    }
+    if (options.directories.cimSchema) {
+        result.cimSchema = cimSchemaFile(*options.directories.cimSchema);
     }
     return result;
 }

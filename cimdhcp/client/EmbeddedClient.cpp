@@ -10,7 +10,9 @@
 #include "client/Response.h"
 #include "client/StatusMessage.h"
 #include "text/DisplayText.h"
+#include "tklogger/TKLogger.h"
 #include "zrclient/InstrumentationService.h"
+#include "zrcommon/LogLevel.h"
 #include "zrcommon/PlatformUtilities.h"
 #include "zrlinux/LiveSource.h"
 
@@ -36,6 +38,13 @@ Response responseOf(const char* operation, cimom::InstancesResult result) {
             std::move(result.instances)};
 }
 
+/// At the level of what is lost without it, for nothing else may tell it.
+void logFailure(const std::string& line) {
+    static const std::string category = "ZR.CIMOM";
+    TKLog::TKLogger::logLevelMessage("cimdhcp/EmbeddedClient", "logFailure", __LINE__, category,
+                                     ZR::LogLevel::failure, nullptr, 0, 0, printable(line));
+}
+
 }  // namespace
 
 EmbeddedClient::EmbeddedClient(const Directories& directories, std::string nameSpace)
@@ -44,6 +53,8 @@ EmbeddedClient::EmbeddedClient(const Directories& directories, std::string nameS
     configuration.schemaDirectories = {directories.schema};
     configuration.registrationFiles = registrationFiles(directories.registrations);
     configuration.providerDirectories = directories.providers;
+    configuration.fullSchema = directories.cimSchema;
+    configuration.log = logFailure;
     try {
         manager_ = std::make_unique<cimom::ObjectManager>(std::move(configuration));
     } catch (const cimom::MofError& error) {

@@ -29,6 +29,43 @@ std::vector<Directories> installations(const fs::path& executable) {
     return {own, {configured, configured, {CIMDHCP_FULL_LIBDIR "/cmpi"}}};
 }
 
+fs::path cimSchemaFile(const fs::path& place) {
+    const auto fail = [&place](const std::string& reason) {
+        throw Failure(ExitStatus::notLoaded, place.string() + ": " + reason +
+                                                 " (from --cim-schema or CIMDHCP_CIM_SCHEMA)");
+    };
+    std::error_code error;
+    if (!fs::is_directory(place, error)) {
+        if (!fs::exists(place, error)) {
+            fail("no such file or directory");
+        }
+        return place;
+    }
+    std::vector<fs::path> found;
+    for (fs::directory_iterator entry(place, error); !error && entry != end(entry);
+         entry.increment(error)) {
+        const fs::path name = entry->path().filename();
+        const bool published =
+            name.extension() == ".mof" &&
+            (name == "CIM_Schema.mof" || name.string().starts_with("cim_schema_"));
+        if (published) {
+            found.push_back(entry->path());
+        }
+    }
+    if (error) {
+        fail(error.message());
+    }
+    if (found.empty()) {
+        fail("neither CIM_Schema.mof nor cim_schema_VERSION.mof is in it");
+    }
+    if (found.size() > 1) {
+        std::sort(found.begin(), found.end());
+        fail("both " + found[0].filename().string() + " and " + found[1].filename().string() +
+             " are in it; name the file");
+    }
+    return found.front();
+}
+
 fs::path executableFile() {
     std::error_code error;
     fs::path file = fs::read_symlink("/proc/self/exe", error);

@@ -10,6 +10,7 @@ struct Directories {
     std::filesystem::path schema;
     std::filesystem::path registrations;
     std::vector<std::filesystem::path> providers;  ///< searched in this order
+    std::filesystem::path cimSchema = {};          ///< file of a whole schema; empty: none
 
     bool operator==(const Directories&) const = default;
 };
@@ -21,6 +22,11 @@ struct Directories {
 
 /// Whether a directory has a MOF file. False for one that cannot be read.
 [[nodiscard]] bool hasSchema(const std::filesystem::path& directory);
+
+/// The file of a whole CIM schema, which includes the others: `place`, or the one in that
+/// directory that has the name which such files are published under, CIM_Schema.mof or
+/// cim_schema_VERSION.mof. Throws Failure when there is none, or several.
+[[nodiscard]] std::filesystem::path cimSchemaFile(const std::filesystem::path& place);
 
 /// The file of this process' program. Throws Failure.
 [[nodiscard]] std::filesystem::path executableFile();

@@ -3,9 +3,11 @@
 #include <algorithm>
 #include <string_view>
 
+#include "cimom/ClassDeclaration.h"
 #include "cimom/ClassRepository.h"
 #include "cimom/Instance.h"
 #include "cimom/Names.h"
+#include "cimom/Requests.h"
 #include "manager/PathMatch.h"
 
 namespace cimom {
@@ -36,11 +38,31 @@ std::vector<End> endsOf(const Instance& association) {
     return ends;
 }
 
+bool isRole(std::string_view name, const std::optional<std::string>& role) noexcept {
+    return !role || sameName(name, *role);
+}
+
 bool hasRole(const End& end, const std::optional<std::string>& role) noexcept {
-    return !role || sameName(end.role, *role);
+    return isRole(end.role, role);
+}
+
+bool takes(const PropertyDeclaration& reference, const std::optional<std::string>& className,
+           const ClassRepository& repository) {
+    return !className || repository.isA(*className, reference.referenceClass) ||
+           repository.isA(reference.referenceClass, *className);
 }
 
 }  // namespace
+
+Status checkClasses(const AssociationRequest& request, const ClassRepository& repository) {
+    for (const auto& className : {request.assocClass, request.resultClass}) {
+        if (className && repository.find(*className) == nullptr) {
+            return {CMPI_RC_ERR_INVALID_PARAMETER,
+                    "no class \"" + *className + "\", by which the associations are to be chosen"};
+        }
+    }
+    return {};
+}
 
 bool isOfClass(const std::string& className, const std::optional<std::string>& wanted,
                const ClassRepository& repository) {
@@ -49,9 +71,6 @@ bool isOfClass(const std::string& className, const std::optional<std::string>& w
 
 bool playsRole(const Instance& association, const ObjectPath& object,
                const std::optional<std::string>& role, const ClassRepository& repository) {
-    if (!role) {
-        return true;
-    }
     const std::vector<End> ends = endsOf(association);
     return std::any_of(ends.begin(), ends.end(), [&](const End& end) {
         return hasRole(end, role) && sameObject(*end.object, object, repository);
@@ -76,6 +95,24 @@ bool connects(const std::vector<Instance>& associations, const ObjectPath& sourc
         }
     }
     return false;
+}
+
+bool canConnect(const ClassDeclaration& association, const std::optional<std::string>& sourceClass,
+                const std::optional<std::string>& otherClass,
+                const std::optional<std::string>& role,
+                const std::optional<std::string>& resultRole, const ClassRepository& repository) {
+    if (!association.isAssociation()) {
+        return true;
+    }
+    const auto& properties = association.properties;
+    return std::any_of(properties.begin(), properties.end(), [&](const auto& near) {
+        return near.type == Type::reference && isRole(near.name, role) &&
+               takes(near, sourceClass, repository) &&
+               std::any_of(properties.begin(), properties.end(), [&](const auto& far) {
+                   return &far != &near && far.type == Type::reference &&
+                          isRole(far.name, resultRole) && takes(far, otherClass, repository);
+               });
+    });
 }
 
 }  // namespace cimom

@@ -15,8 +15,8 @@ namespace cimom {
 [[nodiscard]] bool isOfClass(const std::string& className, const std::optional<std::string>& wanted,
                              const ClassRepository& repository);
 
-/// Whether the association's reference of that role names the object; of an
-/// association path, the keys are its references.
+/// Whether the object is an end of the association, that of the role if one is given; of
+/// an association path, the keys are its references.
 [[nodiscard]] bool playsRole(const Instance& association, const ObjectPath& object,
                              const std::optional<std::string>& role,
                              const ClassRepository& repository);
@@ -27,5 +27,15 @@ namespace cimom {
                             const ObjectPath& other, const std::optional<std::string>& role,
                             const std::optional<std::string>& resultRole,
                             const ClassRepository& repository);
+
+/// Whether associations of the class can have the source, in that role, at one end, and the
+/// other object, in the result role, at another. The class of an object may also be given as
+/// a parent of its own. Of a class that is none of associations, nothing can be told: true.
+[[nodiscard]] bool canConnect(const ClassDeclaration& association,
+                              const std::optional<std::string>& sourceClass,
+                              const std::optional<std::string>& otherClass,
+                              const std::optional<std::string>& role,
+                              const std::optional<std::string>& resultRole,
+                              const ClassRepository& repository);
 
 }  // namespace cimom

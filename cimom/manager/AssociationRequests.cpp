@@ -27,18 +27,62 @@ const ObjectPath& pathOf(const Instance& instance) noexcept {
     return instance.path;
 }
 
-}  // namespace
-
-std::vector<Provider*> ObjectManager::Implementation::associationProviders(
-    const std::string& nameSpace) const {
-    std::vector<Provider*> found;
-    for (const ServedClass& one : served_) {
-        if (one.association && one.isIn(nameSpace) &&
-            std::find(found.begin(), found.end(), one.provider) == found.end()) {
-            found.push_back(one.provider);
+/// The classes of each provider, in the order of the first.
+std::vector<std::pair<Provider*, std::vector<const ServedClass*>>> byProvider(
+    const std::vector<const ServedClass*>& classes) {
+    std::vector<std::pair<Provider*, std::vector<const ServedClass*>>> found;
+    for (const ServedClass* const one : classes) {
+        auto entry =
+            std::ranges::find(found, one->provider, [](const auto& each) { return each.first; });
+        if (entry == found.end()) {
+            entry = found.insert(found.end(), {one->provider, {}});
         }
+        entry->second.push_back(one);
     }
     return found;
+}
+
+}  // namespace
+
+ObjectManager::Implementation::Associations ObjectManager::Implementation::associationsOf(
+    const ObjectPath& source, const std::optional<std::string>& className,
+    const AssociationRequest& request) const {
+    Associations found;
+    found.classes = className ? servedAssociations(*className, source.nameSpace) : associations_;
+    found.exact = className && found.classes.size() == 1 &&
+                  sameName(found.classes.front()->declaration->name, *className);
+    // A provider is asked about any source if the client named its class, since what it
+    // responds is the response.
+    const auto sourceClass = found.exact ? std::nullopt : std::optional(source.className);
+    std::erase_if(found.classes, [&](const ServedClass* one) {
+        return !one->isIn(source.nameSpace) ||
+               !canConnect(*one->declaration, sourceClass, std::nullopt, request.role,
+                           request.resultRole, repository_);
+    });
+    return found;
+}
+
+bool ObjectManager::Implementation::canBeAssociator(const ServedClasses& associations,
+                                                    const ObjectPath& source,
+                                                    const std::string& className,
+                                                    const AssociationRequest& request) const {
+    return repository_.find(className) == nullptr ||
+           std::ranges::any_of(associations, [&](const ServedClass* one) {
+               return canConnect(*one->declaration, source.className, className, request.role,
+                                 request.resultRole, repository_);
+           });
+}
+
+CallOutcome ObjectManager::Implementation::noted(const Provider& provider, const ObjectPath& path,
+                                                 CallOutcome outcome) const {
+    const Status& status = outcome.status;
+    if (!status.ok() && (status.noProvider || !hasNothing(status)) && configuration_.log) {
+        configuration_.log("provider " + provider.name() +
+                           " failed in a request about associations of a " + path.className + ": " +
+                           std::string(statusName(status.code)) +
+                           (status.message.empty() ? "" : ": " + status.message));
+    }
+    return outcome;
 }
 
 template <typename Slot, typename Invoke>
@@ -99,153 +143,121 @@ CallOutcome ObjectManager::Implementation::callReferences(Provider& provider,
                : call(&CMPIAssociationMIFT::references, "references", names.pointer());
 }
 
-/// Every association provider is asked once, for all of its associations.
-ObjectManager::Implementation::Outcomes ObjectManager::Implementation::askAssociators(
-    const ObjectPath& path, const AssociationRequest& request, const AnyReceiver& receiver) {
-    AssociationRequest passed = request;
-    if (passed.assocClass) {
-        passed.assocClass = canonicalClass(*passed.assocClass);
-    }
-    if (passed.resultClass) {
-        passed.resultClass = canonicalClass(*passed.resultClass);
-        if (repository_.withSubclasses(*passed.resultClass).size() > 1) {
-            // Providers compare result classes by name; a parent is filtered afterwards.
-            passed.resultClass.reset();
-        }
-    }
-    Outcomes outcomes;
-    const std::vector<Provider*> providers = associationProviders(path.nameSpace);
-    for (Provider* const provider : providers) {
-        outcomes.calls.push_back(callAssociators(*provider, path, passed, receiver));
-    }
-    // Of several providers, those that have a result count; what all of them refuse is refused.
-    const auto hasResult = [](const CallOutcome& call) {
-        return call.status.code != CMPI_RC_ERR_INVALID_CLASS &&
-               call.status.code != CMPI_RC_ERR_NOT_SUPPORTED &&
-               call.status.code != CMPI_RC_ERR_NOT_FOUND;
-    };
-    if (!outcomes.calls.empty() &&
-        std::none_of(outcomes.calls.begin(), outcomes.calls.end(), hasResult)) {
-        outcomes.calls.resize(1);
-        outcomes.exact = true;
-    }
-    return outcomes;
-}
-
-/// Providers know their association classes by their exact names.
-ObjectManager::Implementation::Outcomes ObjectManager::Implementation::askReferences(
-    const ObjectPath& path, const AssociationRequest& request, const AnyReceiver& receiver) {
-    Outcomes outcomes;
-    if (request.resultClass && repository_.find(*request.resultClass) == nullptr) {
-        // Unknown here; the providers say what that means.
-        for (Provider* const provider : associationProviders(path.nameSpace)) {
-            outcomes.calls.push_back(
-                callReferences(*provider, path, *request.resultClass, request, receiver));
-        }
-        outcomes.exact = outcomes.calls.size() == 1;
-        return outcomes;
-    }
-    ServedClasses targets;
-    if (request.resultClass) {
-        targets = servedAssociations(*request.resultClass, path.nameSpace);
-    } else {
-        for (const ClassDeclaration* const declaration : repository_.classes()) {
-            const auto entry = servedByName_.find(declaration->name);
-            if (entry == servedByName_.end()) {
-                continue;
-            }
-            for (const std::size_t index : entry->second) {
-                if (served_[index].association && served_[index].isIn(path.nameSpace)) {
-                    targets.push_back(&served_[index]);
-                }
-            }
-        }
-    }
-    outcomes.exact = request.resultClass && targets.size() == 1 &&
-                     sameName(targets.front()->declaration->name, *request.resultClass);
-    for (const ServedClass* const target : targets) {
-        outcomes.calls.push_back(
-            callReferences(*target->provider, path, target->declaration->name, request, receiver));
-    }
-    return outcomes;
-}
-
-std::optional<std::vector<Instance>> ObjectManager::Implementation::associationsOf(
-    const ObjectPath& path, const AssociationRequest& request) {
-    AssociationRequest wanted;
-    wanted.resultClass = request.assocClass;
-    wanted.principal = request.principal;
+CallOutcome ObjectManager::Implementation::callForAssociations(
+    Provider& provider, const ServedClasses& classes, const ObjectPath& path,
+    const std::string& principal, std::optional<std::vector<Instance>>& associations) {
+    AssociationRequest all;
+    all.principal = principal;
     CollectedObjects<Instance> collection;
-    RequestedObjects<Instance> requested(collection, surroundings(path), wanted.propertyList);
-    const Outcomes outcomes = askReferences(path, wanted, &requested);
-    const auto unsupported = [](const CallOutcome& call) {
-        return call.status.code == CMPI_RC_ERR_NOT_SUPPORTED;
-    };
-    if (!outcomes.calls.empty() &&
-        std::all_of(outcomes.calls.begin(), outcomes.calls.end(), unsupported)) {
-        return std::nullopt;
+    RequestedObjects<Instance> requested(collection, surroundings(path), all.propertyList);
+    std::vector<CallOutcome> calls;
+    for (const ServedClass* const one : classes) {
+        calls.push_back(callReferences(provider, path, one->declaration->name, all, &requested));
     }
-    std::vector<Instance> associations;
-    if (endOf(outcomes.calls, outcomes.exact).status.ok()) {
-        for (auto& instance : collection.objects) {
-            if (instance) {
-                associations.push_back(*std::move(instance));
-            }
+    if (std::ranges::all_of(calls, [](const CallOutcome& call) {
+            return call.status.code == CMPI_RC_ERR_NOT_SUPPORTED;
+        })) {
+        return {};
+    }
+    associations.emplace();
+    for (auto& instance : collection.objects) {
+        if (instance) {
+            associations->push_back(*std::move(instance));
         }
     }
-    return associations;
+    return {endOf(calls, false).status};
 }
 
-/// The provider compares classes by name, and may leave roles to others.
+/// Every provider is asked once, for all of its associations. It compares classes by name,
+/// and may leave the roles to others.
 template <typename Object>
 RequestEnd ObjectManager::Implementation::associated(ObjectPath path,
                                                      const AssociationRequest& request,
                                                      ResultReceiver<Object>& receiver) {
-    const auto isWanted = [&](const Object& object) {
-        return isOfClass(pathOf(object).className, request.resultClass, repository_);
-    };
-    if (!request.role && !request.resultRole) {
-        return run(path, [&] {
-            RequestedObjects<Object> requested(receiver, surroundings(path), request.propertyList,
-                                               isWanted);
-            return askAssociators(path, request, &requested);
-        });
-    }
-    return run(path, [&] {
-        CollectedObjects<Object> collection;
-        RequestedObjects<Object> requested(collection, surroundings(path), request.propertyList,
-                                           isWanted);
-        Outcomes outcomes = askAssociators(path, request, &requested);
-        if (collection.objects.empty() || !endOf(outcomes.calls, outcomes.exact).status.ok()) {
-            return outcomes;
+    return run(path, [&]() -> RequestEnd {
+        if (Status status = checkClasses(request, repository_); !status.ok()) {
+            return {std::move(status)};
         }
-        // The roles are known by further requests, which have to wait until the
-        // provider has returned: it may hold a lock while it hands objects over. When no
-        // provider can tell them, all of the result counts.
-        const auto known = associationsOf(path, request);
-        for (auto& object : collection.objects) {
-            if (!object || !known ||
-                connects(*known, path, pathOf(*object), request.role, request.resultRole,
-                         repository_)) {
-                receiver.take(std::move(object));
+        AssociationRequest passed = request;
+        if (passed.assocClass) {
+            passed.assocClass = canonicalClass(*passed.assocClass);
+        }
+        if (passed.resultClass) {
+            passed.resultClass = canonicalClass(*passed.resultClass);
+            if (repository_.withSubclasses(*passed.resultClass).size() > 1) {
+                // Providers compare result classes by name; a parent is filtered afterwards.
+                passed.resultClass.reset();
             }
         }
-        return outcomes;
+        const Associations associations = associationsOf(path, request.assocClass, request);
+        std::vector<CallOutcome> calls;
+        for (const auto& [provider, classes] : byProvider(associations.classes)) {
+            const auto isWanted = [&, &its = classes](const Object& object) {
+                const std::string& className = pathOf(object).className;
+                return isOfClass(className, request.resultClass, repository_) &&
+                       canBeAssociator(its, path, className, request);
+            };
+            const auto ask = [&, asked = provider](ResultReceiver<Object>& taker) {
+                RequestedObjects<Object> requested(taker, surroundings(path), request.propertyList,
+                                                   isWanted);
+                return noted(*asked, path, callAssociators(*asked, path, passed, &requested));
+            };
+            if (!request.role && !request.resultRole) {
+                calls.push_back(ask(receiver));
+                continue;
+            }
+            CollectedObjects<Object> collection;
+            CallOutcome& call = calls.emplace_back(ask(collection));
+            if (collection.objects.empty() || !call.status.ok()) {
+                continue;
+            }
+            // The roles are known by further requests, which have to wait until the
+            // provider has returned: it may hold a lock while it hands objects over. When
+            // it cannot tell them, all of the result counts.
+            std::optional<std::vector<Instance>> known;
+            call.status =
+                noted(*provider, path,
+                      callForAssociations(*provider, classes, path, request.principal, known))
+                    .status;
+            if (!call.status.ok()) {
+                continue;
+            }
+            receiver.beginCall();
+            for (auto& object : collection.objects) {
+                if (!object || !known ||
+                    connects(*known, path, pathOf(*object), request.role, request.resultRole,
+                             repository_)) {
+                    receiver.take(std::move(object));
+                }
+            }
+        }
+        return endOfAssociations(calls, associations.exact);
     });
 }
 
+/// Providers know their association classes by their exact names.
 template <typename Object>
 RequestEnd ObjectManager::Implementation::referring(ObjectPath path,
                                                     const AssociationRequest& request,
                                                     ResultReceiver<Object>& receiver) {
-    return run(path, [&] {
+    return run(path, [&]() -> RequestEnd {
+        if (Status status = checkClasses(request, repository_); !status.ok()) {
+            return {std::move(status)};
+        }
         const auto isWanted = [&](const Object& object) {
             return isOfClass(pathOf(object).className, request.resultClass, repository_) &&
                    playsRole(asInstance(object), path, request.role, repository_);
         };
         RequestedObjects<Object> requested(receiver, surroundings(path), request.propertyList,
                                            isWanted);
-        return askReferences(path, request, &requested);
+        const Associations associations = associationsOf(path, request.resultClass, request);
+        std::vector<CallOutcome> calls;
+        for (const ServedClass* const one : associations.classes) {
+            calls.push_back(noted(
+                *one->provider, path,
+                callReferences(*one->provider, path, one->declaration->name, request, &requested)));
+        }
+        return endOfAssociations(calls, associations.exact);
     });
 }
 

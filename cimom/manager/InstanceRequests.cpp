@@ -101,17 +101,17 @@ CallOutcome ObjectManager::Implementation::callModify(const ServedClass& target,
                         });
 }
 
-ObjectManager::Implementation::Outcomes ObjectManager::Implementation::enumerate(
-    Reading reading, const ObjectPath& path, const InstanceRequest& request,
-    const AnyReceiver& receiver) {
-    Outcomes outcomes;
+RequestEnd ObjectManager::Implementation::enumerate(Reading reading, const ObjectPath& path,
+                                                    const InstanceRequest& request,
+                                                    const AnyReceiver& receiver) {
     const ServedClasses targets = servedInstances(path.className, path.nameSpace);
-    outcomes.exact =
+    const bool exact =
         targets.size() == 1 && sameName(targets.front()->declaration->name, path.className);
+    std::vector<CallOutcome> calls;
     for (const ServedClass* const target : targets) {
-        outcomes.calls.push_back(callReading(*target, reading, path, request, receiver));
+        calls.push_back(callReading(*target, reading, path, request, receiver));
     }
-    return outcomes;
+    return endOf(calls, exact);
 }
 
 RequestEnd ObjectManager::Implementation::enumerateInstanceNames(

@@ -35,6 +35,10 @@ ObjectManager::Implementation::Implementation(ObjectManager& manager, Configurat
     if (configuration_.host.empty()) {
         configuration_.host = machineName();
     }
+    if (!configuration_.fullSchema.empty()) {
+        repository_.load(configuration_.fullSchema);
+        repository_.keepDeclared();
+    }
     for (const auto& directory : configuration_.schemaDirectories) {
         repository_.loadDirectory(directory);
     }
@@ -47,6 +51,16 @@ ObjectManager::Implementation::Implementation(ObjectManager& manager, Configurat
     served_.reserve(registrations_.size());
     for (const Registration& registration : registrations_) {
         serve(registration);
+    }
+    for (const ClassDeclaration* const declaration : repository_.classes()) {
+        if (const auto entry = servedByName_.find(declaration->name);
+            entry != servedByName_.end()) {
+            for (const std::size_t index : entry->second) {
+                if (served_[index].association) {
+                    associations_.push_back(&served_[index]);
+                }
+            }
+        }
     }
 }
 

@@ -62,10 +62,10 @@ class ObjectManager::Implementation {
     using AnyReceiver = broker::AnyReceiver;
     using ServedClasses = std::vector<const ServedClass*>;
 
-    /// The outcomes of the calls that one request became.
-    struct Outcomes {
-        std::vector<CallOutcome> calls;
-        /// The client named the class that was asked: its status is that of the whole.
+    /// The association classes that a request can concern, in the order of the repository.
+    struct Associations {
+        ServedClasses classes;
+        /// The client named the one class, whose status is that of the whole.
         bool exact = false;
     };
 
@@ -80,8 +80,17 @@ class ObjectManager::Implementation {
     template <typename Serves>
     [[nodiscard]] ServedClasses served(const std::string& className, const std::string& nameSpace,
                                        Serves&& serves) const;
-    /// Each association provider once, in the order of its first class.
-    [[nodiscard]] std::vector<Provider*> associationProviders(const std::string& nameSpace) const;
+    /// The served associations at or below the class, or all of them, which can have an object
+    /// like the source as an end in the roles of the request.
+    [[nodiscard]] Associations associationsOf(const ObjectPath& source,
+                                              const std::optional<std::string>& className,
+                                              const AssociationRequest& request) const;
+
+    /// Whether the class of what a provider delivered fits one of these associations. A class
+    /// that is not known cannot be told from a fitting one.
+    [[nodiscard]] bool canBeAssociator(const ServedClasses& associations, const ObjectPath& source,
+                                       const std::string& className,
+                                       const AssociationRequest& request) const;
 
     // Calls of one provider.
     [[nodiscard]] CallSettings settings(const std::string& principal, CMPIFlags flags) const;
@@ -107,26 +116,25 @@ class ObjectManager::Implementation {
                                const AnyReceiver& receiver);
 
     // Requests that become several calls.
-    Outcomes enumerate(Reading reading, const ObjectPath& path, const InstanceRequest& request,
-                       const AnyReceiver& receiver);
-    Outcomes askAssociators(const ObjectPath& path, const AssociationRequest& request,
-                            const AnyReceiver& receiver);
-    Outcomes askReferences(const ObjectPath& path, const AssociationRequest& request,
-                           const AnyReceiver& receiver);
+    RequestEnd enumerate(Reading reading, const ObjectPath& path, const InstanceRequest& request,
+                         const AnyReceiver& receiver);
     template <typename Object>
     RequestEnd associated(ObjectPath path, const AssociationRequest& request,
                           ResultReceiver<Object>& receiver);
     template <typename Object>
     RequestEnd referring(ObjectPath path, const AssociationRequest& request,
                          ResultReceiver<Object>& receiver);
-    /// The ends of the associations of the object; nothing when no provider
-    /// can tell.
-    std::optional<std::vector<Instance>> associationsOf(const ObjectPath& path,
-                                                        const AssociationRequest& request);
+    /// Tells the associations of the object that one provider has, for a comparison of roles;
+    /// nothing when the provider does not offer to tell them.
+    CallOutcome callForAssociations(Provider& provider, const ServedClasses& classes,
+                                    const ObjectPath& path, const std::string& principal,
+                                    std::optional<std::vector<Instance>>& associations);
+    /// The outcome, after a failure was written to the log.
+    CallOutcome noted(const Provider& provider, const ObjectPath& path, CallOutcome outcome) const;
 
     /// Borrows the request's namespace.
     [[nodiscard]] RequestSurroundings surroundings(const ObjectPath& path) const {
-        return {repository_, configuration_.host, path.nameSpace};
+        return {configuration_.host, path.nameSpace};
     }
     /// Carries a request out by `ask`, which gets the path in its canonical form.
     template <typename Ask>
@@ -139,6 +147,7 @@ class ObjectManager::Implementation {
     /// Indices into served_, by class name.
     std::unordered_map<std::string_view, std::vector<std::size_t>, NameHash, NameEqual>
         servedByName_;
+    ServedClasses associations_;  ///< all, in the order of the repository
     std::vector<std::string> nameSpaces_;
     /// Ends first: a provider that is being cleaned up may still ask.
     std::optional<Providers> providers_;
@@ -150,8 +159,7 @@ RequestEnd ObjectManager::Implementation::run(ObjectPath& path, Ask&& ask) const
         if (Status status = canonical(path); !status.ok()) {
             return {std::move(status)};
         }
-        const Outcomes outcomes = std::forward<Ask>(ask)();
-        return endOf(outcomes.calls, outcomes.exact);
+        return std::forward<Ask>(ask)();
     } catch (const broker::ConversionError& error) {
         return {{CMPI_RC_ERR_INVALID_PARAMETER, error.what()}};
     }

@@ -1,5 +1,7 @@
 #include "manager/ProviderCall.h"
 
+#include <algorithm>
+
 namespace cimom {
 
 namespace {
@@ -8,14 +10,19 @@ namespace {
 /// nothing when the provider does not know the class or the operation.
 Status overall(const std::vector<CallOutcome>& calls, bool exact) {
     for (const CallOutcome& call : calls) {
-        const bool nothingToAdd = !exact && (call.status.code == CMPI_RC_ERR_INVALID_CLASS ||
-                                             call.status.code == CMPI_RC_ERR_NOT_SUPPORTED ||
-                                             call.status.code == CMPI_RC_ERR_NOT_FOUND);
-        if (!call.status.ok() && !nothingToAdd) {
+        if (!call.status.ok() && (exact || !hasNothing(call.status))) {
             return call.status;
         }
     }
     return {};
+}
+
+unsigned returnDoneCallsOf(const std::vector<CallOutcome>& calls) noexcept {
+    unsigned count = 0;
+    for (const CallOutcome& call : calls) {
+        count += call.returnDoneCalls;
+    }
+    return count;
 }
 
 }  // namespace
@@ -35,10 +42,24 @@ CallOutcome missingSlot(const std::string& provider, const char* slot) {
     return {{CMPI_RC_ERR_NOT_SUPPORTED, "provider " + provider + " does not offer " + slot}};
 }
 
+bool hasNothing(const Status& status) noexcept {
+    return status.code == CMPI_RC_ERR_INVALID_CLASS || status.code == CMPI_RC_ERR_NOT_SUPPORTED ||
+           status.code == CMPI_RC_ERR_NOT_FOUND;
+}
+
 RequestEnd endOf(const std::vector<CallOutcome>& calls, bool exact) {
-    RequestEnd end{overall(calls, exact)};
-    for (const CallOutcome& call : calls) {
-        end.returnDoneCalls += call.returnDoneCalls;
+    return {overall(calls, exact), returnDoneCallsOf(calls)};
+}
+
+RequestEnd endOfAssociations(const std::vector<CallOutcome>& calls, bool exact) {
+    RequestEnd end{{}, returnDoneCallsOf(calls)};
+    if (std::ranges::none_of(calls, [](const CallOutcome& call) { return call.status.ok(); })) {
+        const auto told = std::ranges::find_if(calls, [exact](const CallOutcome& call) {
+            return exact || call.status.code != CMPI_RC_ERR_INVALID_CLASS;
+        });
+        if (told != calls.end()) {
+            end.status = told->status;
+        }
     }
     return end;
 }

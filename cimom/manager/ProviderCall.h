@@ -46,11 +46,21 @@ struct CallOutcome {
     unsigned returnDoneCalls = 0;
 };
 
+/// Whether the status tells that the provider has nothing of what it was asked for, and not
+/// that it failed.
+[[nodiscard]] bool hasNothing(const Status& status) noexcept;
+
 [[nodiscard]] CallOutcome missingSlot(const std::string& provider, const char* slot);
 
-/// The status of several calls as one, and what was counted. `exact`: the client named
-/// the class that was asked, whose status is that of the whole.
+/// The end of a request about instances that became these calls, and what was counted.
+/// `exact`: the client named the class that was asked, whose status is that of the whole.
 [[nodiscard]] RequestEnd endOf(const std::vector<CallOutcome>& calls, bool exact);
+
+/// The end of a request about associations. What one provider responds does not depend on
+/// another, so the whole fails only when every call does, with the first error. A provider
+/// that does not know the class which it was asked for has nothing to add: no error, unless
+/// the client named that class.
+[[nodiscard]] RequestEnd endOfAssociations(const std::vector<CallOutcome>& calls, bool exact);
 
 // The receiver as the calls of a provider need it.
 void beginCall(const broker::AnyReceiver& receiver);

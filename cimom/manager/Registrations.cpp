@@ -1,6 +1,7 @@
 #include "cimom/Registrations.h"
 
 #include <algorithm>
+#include <array>
 #include <cerrno>
 #include <cstring>
 #include <fstream>
@@ -15,6 +16,10 @@ namespace cimom {
 namespace {
 
 constexpr std::string_view blanks = " \t\r\v\f";
+
+/// In which process a provider runs, as whom and how long. All providers run in this one
+/// here, and none has parameters.
+constexpr std::array<std::string_view, 4> processKeys{"group", "unload", "parameters", "user"};
 
 std::string_view trimmed(std::string_view text) noexcept {
     const std::size_t first = text.find_first_not_of(blanks);
@@ -48,6 +53,8 @@ class RegistrationReader {
             }
             if (text.front() == '[') {
                 beginSection(text);
+            } else if (!current_ && text.find(':') == std::string_view::npos) {
+                readColumns(text);
             } else {
                 readEntry(text);
             }
@@ -62,6 +69,31 @@ class RegistrationReader {
   private:
     [[noreturn]] void fail(std::size_t line, const std::string& reason) const {
         throw LoadError(file_.string() + ":" + std::to_string(line) + ": " + reason);
+    }
+
+    /// A class in one line: class, namespace, provider, location and its types.
+    void readColumns(std::string_view text) {
+        std::istringstream words{std::string(text)};
+        std::string className;
+        std::string nameSpace;
+        std::string provider;
+        std::string location;
+        if (!(words >> className >> nameSpace >> provider >> location) || !(words >> std::ws) ||
+            words.eof() || !isName(className)) {
+            fail(line_, "\"" + std::string(text) +
+                            "\" is neither [CLASS] nor a line of the form "
+                            "CLASS NAMESPACE PROVIDER LOCATION TYPE...");
+        }
+        current_.emplace();
+        current_->className = className;
+        typeGiven_ = false;
+        readNameSpaces(nameSpace);
+        set(current_->provider, "provider", provider);
+        set(current_->location, "location", location);
+        std::string types;
+        std::getline(words, types);
+        readTypes(types);
+        endSection();
     }
 
     void beginSection(std::string_view text) {
@@ -108,6 +140,10 @@ class RegistrationReader {
         }
         const std::string_view key = trimmed(text.substr(0, colon));
         const std::string_view value = trimmed(text.substr(colon + 1));
+        if (std::ranges::any_of(processKeys,
+                                [key](std::string_view each) { return sameName(key, each); })) {
+            return;
+        }
         if (value.empty()) {
             fail(line_, "\"" + std::string(key) + ":\" has no value");
         }

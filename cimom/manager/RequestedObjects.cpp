@@ -4,8 +4,6 @@
 #include <memory>
 #include <utility>
 
-#include "cimom/ClassDeclaration.h"
-#include "cimom/ClassRepository.h"
 #include "cimom/Instance.h"
 #include "cimom/Names.h"
 
@@ -42,17 +40,6 @@ void complete(ObjectPath& path, const RequestSurroundings& surroundings) {
 void complete(Instance& instance, const RequestSurroundings& surroundings) {
     for (NamedValue& property : instance.properties) {
         completeReference(property.value, surroundings.nameSpace);
-    }
-    // Some providers set key properties only, and leave the path without them.
-    if (const auto* const declaration = surroundings.classes.find(instance.path.className)) {
-        for (const std::size_t position : declaration->index.keys()) {
-            const std::string& key = declaration->properties[position].name;
-            const Value* const value =
-                instance.path.key(key) == nullptr ? instance.property(key) : nullptr;
-            if (value != nullptr && !value->isNull()) {
-                instance.path.keys.push_back({key, *value});
-            }
-        }
     }
     complete(instance.path, surroundings);
 }

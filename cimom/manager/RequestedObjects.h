@@ -13,13 +13,11 @@ namespace cimom {
 
 /// What the objects of a request get that providers may leave out. Borrows all.
 struct RequestSurroundings {
-    const ClassRepository& classes;
     const std::string& host;
     const std::string& nameSpace;
 };
 
-/// Adds host and namespace where they are missing, and to an instance's path the keys
-/// that are among its properties only.
+/// Adds host and namespace where they are missing.
 void complete(ObjectPath& path, const RequestSurroundings& surroundings);
 void complete(Instance& instance, const RequestSurroundings& surroundings);
 

@@ -48,7 +48,8 @@ class ClassRepository::Implementation {
     struct Node {
         ClassDeclaration declaration;
         const Node* superclass = nullptr;
-        std::vector<const Node*> subclasses;  ///< in the order of loading
+        bool stands = false;                       ///< against further declarations
+        std::vector<const Node*> subclasses = {};  ///< in the order of loading
     };
 
     void loadFile(const std::filesystem::path& file) {
@@ -84,6 +85,13 @@ class ClassRepository::Implementation {
 
     [[nodiscard]] const std::deque<Node>& nodes() const noexcept { return nodes_; }
 
+    void keepDeclared() noexcept {
+        for (Node& node : nodes_) {
+            node.stands = true;
+        }
+        qualifierTypes_.keepDeclared();
+    }
+
     void complete() const {
         for (const ReferenceUse& use : forwardReferences_) {
             if (find(use.className) == nullptr) {
@@ -118,7 +126,10 @@ class ClassRepository::Implementation {
     }
 
     void add(const MofClass& written, const std::string& file) {
-        if (find(written.name) != nullptr) {
+        if (const Node* const known = find(written.name)) {
+            if (known->stands) {
+                return;
+            }
             throw MofError(file, written.position, "class " + written.name + " is declared twice");
         }
         Node* superclass = nullptr;
@@ -142,7 +153,7 @@ class ClassRepository::Implementation {
         });
         forwardReferences_.insert(forwardReferences_.end(), references.begin(), references.end());
         declaration.index = PropertyIndex(declaration.properties);
-        Node& node = nodes_.emplace_back(Node{std::move(declaration), superclass, {}});
+        Node& node = nodes_.emplace_back(Node{std::move(declaration), superclass});
         nodesByName_.emplace(node.declaration.name, &node);
         if (superclass != nullptr) {
             superclass->subclasses.push_back(&node);
@@ -208,6 +219,10 @@ void ClassRepository::loadDirectory(const std::filesystem::path& directory) {
 
 void ClassRepository::loadText(std::string_view text, const std::string& file) {
     implementation_->loadText(text, file);
+}
+
+void ClassRepository::keepDeclared() noexcept {
+    implementation_->keepDeclared();
 }
 
 void ClassRepository::complete() const {

@@ -45,9 +45,24 @@ void QualifierTypes::add(const MofQualifierType& declaration, const std::string&
     entry.prototype.toSubclass = declaration.flavors.toSubclass.value_or(true);
     entry.prototype.translatable = declaration.flavors.translatable.value_or(false);
     entry.scopes = declaration.scopes;
-    if (!entries_.emplace(declaration.name, std::move(entry)).second) {
+    const auto known = entries_.find(std::string_view(declaration.name));
+    if (known == entries_.end()) {
+        entries_.emplace(declaration.name, std::move(entry));
+    } else if (!known->second.stands && !isSame(known->second, entry)) {
         throw MofError(file, declaration.position,
-                       "qualifier " + declaration.name + " is declared twice");
+                       "qualifier " + declaration.name + " is declared twice, in different ways");
+    }
+}
+
+bool QualifierTypes::isSame(const Entry& a, const Entry& b) {
+    Qualifier renamed = b.prototype;
+    renamed.name = a.prototype.name;  // in any case of its letters
+    return a.prototype == renamed && std::ranges::is_permutation(a.scopes, b.scopes);
+}
+
+void QualifierTypes::keepDeclared() noexcept {
+    for (auto& [name, entry] : entries_) {
+        entry.stands = true;
     }
 }
 
@@ -71,7 +86,8 @@ Qualifier QualifierTypes::resolveOne(const MofQualifier& written, MofScope scope
     if (found == entries_.end()) {
         throw MofError(file, written.position, "qualifier " + written.name + " is not declared");
     }
-    const auto& [prototype, scopes] = found->second;
+    const Qualifier& prototype = found->second.prototype;
+    const std::vector<MofScope>& scopes = found->second.scopes;
     const bool allowed = std::any_of(scopes.begin(), scopes.end(), [scope](MofScope each) {
         return each == scope || each == MofScope::any;
     });

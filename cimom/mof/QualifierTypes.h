@@ -15,9 +15,12 @@ namespace cimom {
 /// where, with which values, and whether these pass to subclasses.
 class QualifierTypes {
   public:
-    /// Throws MofError for a type that is declared twice or whose default value
-    /// is not of its type.
+    /// The same declaration once more changes nothing. Throws MofError for a type that is
+    /// declared twice in different ways, or whose default value is not of its type.
     void add(const MofQualifierType& declaration, const std::string& file);
+
+    /// Types that are declared now stand: further declarations of them are passed over.
+    void keepDeclared() noexcept;
 
     /// The qualifiers written at an element of this scope, with the flavors that
     /// hold for them. Throws MofError for one that is unknown, stands in the wrong
@@ -29,8 +32,10 @@ class QualifierTypes {
     struct Entry {
         Qualifier prototype;  ///< its value is the default
         std::vector<MofScope> scopes;
+        bool stands = false;
     };
 
+    [[nodiscard]] static bool isSame(const Entry& a, const Entry& b);
     [[nodiscard]] Qualifier resolveOne(const MofQualifier& written, MofScope scope,
                                        const std::string& file) const;
 

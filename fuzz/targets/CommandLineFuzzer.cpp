@@ -142,9 +142,12 @@ Arguments written(const CommandLine& line) {
     addOption(writer.arguments, "data-dir", line.options.dataDir);
     addOption(writer.arguments, "namespace", line.options.nameSpace);
     addOption(writer.arguments, "format", nameOf(line.options.format));
-    addOption(writer.arguments, "schema-dir", line.options.schemaDir);
-    addOption(writer.arguments, "registration-dir", line.options.registrationDir);
-    addOption(writer.arguments, "provider-dir", line.options.providerDir);
+    addOption(writer.arguments, "schema-dir", line.options.directories.schemaDir);
+    addOption(writer.arguments, "registration-dir", line.options.directories.registrationDir);
+    for (const std::string& directory : line.options.directories.providerDirs) {
+        addOption(writer.arguments, "provider-dir", directory);
+    }
+    addOption(writer.arguments, "cim-schema", line.options.directories.cimSchema);
     for (const std::string& server : line.options.connect) {
         addOption(writer.arguments, "connect", server);
     }

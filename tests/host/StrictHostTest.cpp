@@ -4,8 +4,6 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "kit/FullSchema.h"
-
 namespace {
 
 using strict::ResultObject;
@@ -208,10 +206,9 @@ TEST_F(StrictHostTest, DefaultsOfParentsAreShownWhereNullIsNoInitialiser) {
         const cimom::Scalar* scalar = value == nullptr ? nullptr : value->scalar();
         return scalar == nullptr ? 0U : std::get<std::uint64_t>(*scalar);
     };
-    const test::FullSchema schema;
-    StrictHost parents = makeHost({.parentsDefaults = true}, schema.path());
+    StrictHost parents = makeHost({.parentsDefaults = true}, strict::wholeSchema);
     EXPECT_EQ(shown(parents), 12U);
-    StrictHost plain = makeHost({}, schema.path());
+    StrictHost plain = makeHost({}, strict::wholeSchema);
     EXPECT_EQ(shown(plain), 0U);
 }
 

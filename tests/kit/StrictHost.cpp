@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <exception>
+#include <filesystem>
 #include <utility>
 
 #include "cimom/Names.h"
@@ -16,9 +17,15 @@ namespace {
 
 using Kind = ResultObject::Kind;
 
-cimom::ClassRepository loadSchema(const std::string& directory) {
+cimom::ClassRepository loadSchema(const std::string& schema) {
     cimom::ClassRepository repository;
-    repository.loadDirectory(directory);
+    if (std::filesystem::is_directory(schema)) {
+        repository.loadDirectory(schema);
+    } else {
+        repository.load(schema);
+        repository.keepDeclared();
+        repository.loadDirectory(ZR_SOURCE_DIR "/schema");
+    }
     repository.complete();
     return repository;
 }
@@ -60,10 +67,9 @@ void append(StrictHost::Response& all, StrictHost::Response one) {
 
 }  // namespace
 
-StrictHost::StrictHost(const std::string& schemaDirectory,
-                       const std::vector<std::string>& registrations, std::string libraryDirectory,
-                       const Traits& traits)
-    : repository_(loadSchema(schemaDirectory)),
+StrictHost::StrictHost(const std::string& schema, const std::vector<std::string>& registrations,
+                       std::string libraryDirectory, const Traits& traits)
+    : repository_(loadSchema(schema)),
       registrations_(readAll(registrations)),
       directory_(std::move(libraryDirectory)),
       traits_(traits),

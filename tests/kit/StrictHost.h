@@ -14,6 +14,10 @@
 
 namespace strict {
 
+/// The standard schema with all superclasses, their properties and their defaults, as object
+/// managers bring it.
+inline const std::string wholeSchema = ZR_SOURCE_DIR "/tests/schema/cim-2.41/cim_schema_2.41.0.mof";
+
 /// An object manager for tests that treats providers as the least forgiving of the
 /// real ones do. Its libraries are opened with RTLD_GLOBAL; its broker tells version 0
 /// and has slots that are null; requests for a superclass become one call per
@@ -32,7 +36,9 @@ class StrictHost {
         std::vector<cimom::Instance> instances;
     };
 
-    StrictHost(const std::string& schemaDirectory, const std::vector<std::string>& registrations,
+    /// `schema` is a directory of MOF files, or the file of a whole standard schema, over
+    /// which the classes of this project are loaded.
+    StrictHost(const std::string& schema, const std::vector<std::string>& registrations,
                std::string libraryDirectory, const Traits& traits = {});
     ~StrictHost();
     StrictHost(const StrictHost&) = delete;

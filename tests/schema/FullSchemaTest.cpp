@@ -1,6 +1,6 @@
 // Our classes over the parents of the final CIM schema 2.41 in place of the reduced ones
 // that are shipped. The schema itself is not in Debian, and this project does not copy
-// it: tests/schema/cim-2.41.mof tells what it declares of these parents. The variable
+// it: tests/schema/cim-2.41 tells what it declares of these parents. The variable
 // ZR_CIM_SCHEMA names the directory of the schema as DMTF publishes it, for the test
 // that reads all of it.
 #include <gtest/gtest.h>
@@ -13,19 +13,27 @@
 #include "cimom/ClassDeclaration.h"
 #include "cimom/Instance.h"
 #include "cimom/MofError.h"
+#include "cimom/ObjectManager.h"
 
 namespace cimom {
 namespace {
 
 const std::filesystem::path source = ZR_SOURCE_DIR;
 
-ClassRepository loadOverFullParents() {
+const std::filesystem::path fullSchema = source / "tests/schema/cim-2.41/cim_schema_2.41.0.mof";
+
+/// All that is shipped, of which our classes alone are new.
+ClassRepository loadOver(const std::filesystem::path& schema) {
     ClassRepository loaded;
-    loaded.load(source / "schema/01-qualifiers.mof");
-    loaded.load(source / "tests/schema/cim-2.41.mof");
-    loaded.load(source / "schema/10-dhcp-client.mof");
+    loaded.load(schema);
+    loaded.keepDeclared();
+    loaded.loadDirectory(source / "schema");
     loaded.complete();
     return loaded;
+}
+
+ClassRepository loadOverFullParents() {
+    return loadOver(fullSchema);
 }
 
 bool isOurs(const ClassDeclaration& declaration) {
@@ -114,6 +122,31 @@ TEST(FullSchema, OurClassesHaveTheSamePropertiesOverItAsOverTheShippedParents) {
     }
 }
 
+TEST(FullSchema, TakesThePlaceOfTheReducedOneInTheObjectManager) {
+    Configuration configuration;
+    configuration.schemaDirectories = {source / "schema"};
+    const ObjectManager reduced(configuration);
+    configuration.fullSchema = fullSchema;
+    const ObjectManager full(configuration);
+    const auto described = [](const ObjectManager& manager) {
+        const auto& state =
+            *manager.repository().find("CIM_ProtocolEndpoint")->property("EnabledState");
+        return state.defaultValue.isNull() ? "reduced" : "full";
+    };
+    EXPECT_STREQ(described(reduced), "reduced");
+    EXPECT_STREQ(described(full), "full");
+    EXPECT_EQ(reduced.repository().find("CIM_Job"), nullptr);
+    EXPECT_NE(full.repository().find("CIM_Job"), nullptr);
+    EXPECT_TRUE(full.repository().isA("QVXZR_DHCPProtocolEndpoint", "CIM_ManagedElement"));
+}
+
+TEST(FullSchema, JobsOfMethodsHaveAKeyOfTheirOwn) {
+    const ClassRepository repository = loadOverFullParents();
+    EXPECT_EQ(repository.find("CIM_ConcreteJob")->superclass, "CIM_Job");
+    EXPECT_TRUE(repository.find("CIM_ConcreteJob")->property("InstanceID")->isKey());
+    EXPECT_FALSE(repository.find("CIM_Job")->property("InstanceID")->isKey());
+}
+
 TEST(FullSchema, ASecondDeclarationOfAnInheritedNameIsRefusedWithoutOverride) {
     ClassRepository repository = loadOverFullParents();
     EXPECT_THROW(repository.loadText("class TEST_Endpoint : QVXZR_DHCPProtocolEndpoint {\n"
@@ -130,10 +163,8 @@ TEST(FullSchema, IsReadAsDmtfPublishesIt) {
         GTEST_SKIP() << "ZR_CIM_SCHEMA does not name a directory with the CIM schema 2.41 "
                         "(cim_schema_2.41.0.mof and what it includes), which dmtf.org has";
     }
-    ClassRepository repository;
-    repository.load(std::filesystem::path(directory) / "cim_schema_2.41.0.mof");
-    repository.load(source / "schema/10-dhcp-client.mof");
-    repository.complete();
+    const ClassRepository repository =
+        loadOver(std::filesystem::path(directory) / "cim_schema_2.41.0.mof");
     expectOursWithoutDefaults(repository);
     const ClassRepository told = loadOverFullParents();
     for (const ClassDeclaration* each : told.classes()) {

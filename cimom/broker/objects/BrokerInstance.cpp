@@ -1,5 +1,8 @@
 #include "broker/objects/BrokerInstance.h"
 
+#include <algorithm>
+#include <vector>
+
 #include "broker/BrokerTypes.h"
 #include "broker/objects/BrokerStatus.h"
 #include "cimom/ClassDeclaration.h"
@@ -94,6 +97,28 @@ bool isKept(const PropertyFilter& filter, std::string_view name) noexcept {
     return false;
 }
 
+bool isKey(const ClassDeclaration& declaration, const PropertyDeclaration& property) noexcept {
+    const std::vector<std::size_t>& keys = declaration.index.keys();
+    const auto position = static_cast<std::size_t>(&property - declaration.properties.data());
+    return std::find(keys.begin(), keys.end(), position) != keys.end();
+}
+
+/// Takes the value of a key property into the path, if the path has not had the key from
+/// the start. The path shares the value, which is in the same arena.
+void setKey(InstanceRecord& instance, const NameKey& name, const CMPIData& data) {
+    EntryList& keys = instance.path->keys;
+    const CMPICount position = keys.position(name);
+    if (position < instance.ownKeys) {
+        return;
+    }
+    if ((data.state & CMPI_nullValue) == 0) {
+        keys.set(*instance.arena, name, data);
+    } else if (position < keys.size()) {
+        keys.remove(position);  // keys cannot be null
+    }
+    instance.handedOut->store(nullptr, std::memory_order_release);
+}
+
 CMPIrc set(InstanceRecord* instance, const char* name, const CMPIValue* value, CMPIType type) {
     if (instance == nullptr) {
         return CMPI_RC_ERR_INVALID_HANDLE;
@@ -107,7 +132,9 @@ CMPIrc set(InstanceRecord* instance, const char* name, const CMPIValue* value, C
     if (declared != nullptr && !fits(*declared, type)) {
         return CMPI_RC_ERR_TYPE_MISMATCH;
     }
-    if (!isKept(instance->filter, name)) {
+    const bool isPathKey = declared != nullptr && isKey(*instance->declaration, *declared);
+    const bool kept = isKept(instance->filter, name);
+    if (!kept && !isPathKey) {
         return CMPI_RC_OK;
     }
     CMPIData data{};
@@ -117,7 +144,12 @@ CMPIrc set(InstanceRecord* instance, const char* name, const CMPIValue* value, C
     if (type == CMPI_null && declared != nullptr) {
         data.type = cmpiType(declared->type, declared->isArray);
     }
-    instance->properties.set(*instance->arena, key, data);
+    if (isPathKey) {
+        setKey(*instance, NameKey(declared->name), data);
+    }
+    if (kept) {
+        instance->properties.set(*instance->arena, key, data);
+    }
     return CMPI_RC_OK;
 }
 
@@ -161,16 +193,27 @@ CMPIStatus setObjectPath(const CMPIInstance* self, const CMPIObjectPath* path) {
         if (source == nullptr) {
             return CMPI_RC_ERR_INVALID_PARAMETER;
         }
+        const EntryList former = instance->path->keys;
+        const CMPICount ownFormer = instance->ownKeys;
         instance->path = copyPath(*instance->arena, *source);
+        instance->ownKeys = instance->path->keys.size();
         instance->declaration =
             source->classes == nullptr ? nullptr : source->classes->find(source->className->view());
         instance->handedOut->store(nullptr, std::memory_order_release);
+        for (CMPICount index = ownFormer; index < former.size(); ++index) {
+            const NameKey name(former[index].name->view());
+            const PropertyDeclaration* const declared =
+                instance->declaration == nullptr ? nullptr : instance->declaration->property(name);
+            if (declared != nullptr && isKey(*instance->declaration, *declared)) {
+                setKey(*instance, name, former[index].data);
+            }
+        }
         return CMPI_RC_OK;
     });
 }
 
-/// Properties that the filter excludes are dropped, those set before too. Key
-/// names do not matter: keys are in the path.
+/// Properties that the filter excludes are dropped, those set before too. The names of
+/// keys do not matter: keys stay in the path.
 CMPIStatus setPropertyFilter(const CMPIInstance* self, const char** names, const char**) {
     return guarded([=] {
         InstanceRecord* const instance = instanceOf(self);
@@ -206,6 +249,7 @@ InstanceRecord* make(Arena& arena, const PathRecord& path) {
         &arena,
         copyPath(arena, path),
         path.classes == nullptr ? nullptr : path.classes->find(path.className->view()),
+        path.keys.size(),
         EntryList{},
         PropertyFilter{},
         handedOut};
@@ -234,6 +278,7 @@ InstanceRecord* makeInstance(Arena& arena, const PathRecord& path) {
 
 InstanceRecord* copyInstance(Arena& arena, const InstanceRecord& instance) {
     InstanceRecord* const copy = make(arena, *instance.path);
+    copy->ownKeys = instance.ownKeys;
     copy->properties = instance.properties.copyInto(arena);
     copy->filter = instance.filter;
     if (instance.filter.active) {

@@ -18,12 +18,15 @@ struct PropertyFilter {
     StringRecord** names = nullptr;
 };
 
-/// A CMPIInstance.
+/// A CMPIInstance. A key that its path lacks is added to the path when it is set as a
+/// property, also when the filter excludes the property: some providers make all paths so.
 // NOLINTNEXTLINE(cppcoreguidelines-pro-type-member-init): the arena value-initialises it
 struct InstanceRecord : CMPIInstance {
     Arena* arena;
     PathRecord* path;
     const ClassDeclaration* declaration;  ///< null: its class is unknown, nothing is checked
+    /// So many keys came with the path; those behind them were set as properties.
+    CMPICount ownKeys;
     EntryList properties;
     PropertyFilter filter;
     /// The copy of the path last handed out; handed out again while neither has changed.

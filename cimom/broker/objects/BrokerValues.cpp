@@ -135,6 +135,11 @@ const Entry* EntryList::find(std::string_view name) const noexcept {
     return locate(NameKey(name));
 }
 
+CMPICount EntryList::position(const NameKey& name) const noexcept {
+    const Entry* const entry = locate(name);
+    return entry == nullptr ? size_ : static_cast<CMPICount>(entry - entries_);
+}
+
 void EntryList::reserve(Arena& arena, CMPICount capacity) {
     if (capacity <= capacity_) {
         return;

@@ -44,6 +44,8 @@ class EntryList {
         return entries_[index];
     }
     [[nodiscard]] const Entry* find(std::string_view name) const noexcept;
+    /// size() when there is none of the name.
+    [[nodiscard]] CMPICount position(const NameKey& name) const noexcept;
 
     void reserve(Arena& arena, CMPICount capacity);
     /// Adds the value, or replaces the one of that name.

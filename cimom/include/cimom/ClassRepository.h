@@ -32,6 +32,10 @@ class ClassRepository {
     /// Reads MOF text; `file` is the name that errors give, and what
     /// "#pragma include" is relative to.
     void loadText(std::string_view text, const std::string& file);
+    /// From here on, a declaration of a class or a qualifier that is known now is passed over:
+    /// the one that was read stands, for instance that of a full schema beside which a reduced
+    /// one is read.
+    void keepDeclared() noexcept;
     /// Checks what only the whole shows: every reference names a known class.
     /// Throws MofError at the first that does not. (A class may be referenced
     /// before it is declared; a reference to a class that is known already is

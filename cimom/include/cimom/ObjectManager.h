@@ -1,6 +1,7 @@
 #pragma once
 
 #include <filesystem>
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -12,10 +13,16 @@
 namespace cimom {
 
 struct Configuration {
-    std::vector<std::filesystem::path> schemaDirectories;
+    std::vector<std::filesystem::path> schemaDirectories;  ///< read in this order
     std::vector<std::filesystem::path> registrationFiles;
     std::vector<std::filesystem::path> providerDirectories;  ///< searched in this order
     std::string host;  ///< host of full paths; the machine's name when empty
+    /// A file of a whole CIM schema, with what it includes. It is read first, and what it
+    /// declares stands: the schema directories add to it. Empty: none.
+    std::filesystem::path fullSchema = {};
+    /// Gets a line about each call of a provider that failed while others were asked the same,
+    /// since the client may not be told. Any thread calls it, several at once. Empty: no log.
+    std::function<void(const std::string& line)> log = {};
 };
 
 /// Loads CMPI 2.0 providers and carries requests to them. Safe for concurrent

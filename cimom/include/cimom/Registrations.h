@@ -27,7 +27,9 @@ class LoadError : public std::runtime_error {
 
 /// Reads a registration file: a section "[CLASS]" per class with the lines
 /// "provider:", "location:", "type:" and "namespace:" (the last two with one or
-/// several words), "#" comments. Throws LoadError with file and line.
+/// several words), or a line "CLASS NAMESPACE PROVIDER LOCATION TYPE..." per class,
+/// before any section; "#" comments. The lines "group:", "unload:", "parameters:" and
+/// "user:" of a section mean nothing here. Throws LoadError with file and line.
 [[nodiscard]] std::vector<Registration> readRegistrations(const std::filesystem::path& file);
 
 }  // namespace cimom

@@ -25,6 +25,11 @@ struct AssociationRequest {
     std::string principal;
 };
 
+/// INVALID_PARAMETER for a class of the request that is not known, which DSP0200 requires; a
+/// role that no association has, and a class that is none of associations, leave nothing.
+[[nodiscard]] Status checkClasses(const AssociationRequest& request,
+                                  const ClassRepository& repository);
+
 /// How a request ended whose objects went to a receiver.
 struct RequestEnd {
     Status status;

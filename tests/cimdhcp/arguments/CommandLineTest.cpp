@@ -49,12 +49,13 @@ TEST_F(CommandLineText, TakesAllOptions) {
     options.dataDir = "/data";
     options.nameSpace = "root/other";
     options.format = Format::json;
-    options.schemaDir = "/s";
-    options.registrationDir = "/r";
-    options.providerDir = "/p";
+    options.directories.schemaDir = "/s";
+    options.directories.registrationDir = "/r";
+    options.directories.providerDirs = {"/p", "/q"};
+    options.directories.cimSchema = "/c";
     EXPECT_EQ(line({"--tree", "t.json", "--data-dir", "/data", "--namespace", "/root/other/",
                     "--format", "json", "--schema-dir", "/s", "--registration-dir", "/r",
-                    "--provider-dir", "/p", "tree"}),
+                    "--provider-dir", "/p", "--provider-dir", "/q", "--cim-schema", "/c", "tree"}),
               (CommandLine{options, TreeCommand{}}));
 }
 
@@ -67,9 +68,9 @@ TEST_F(CommandLineText, LooksForDirectoriesInTheEnvironment) {
     ::setenv("CIMDHCP_REGISTRATION_DIR", "/r", 1);
     ::setenv("CIMDHCP_PROVIDER_DIR", "/p", 1);
     const Options options = line({"show", "--provider-dir", "/mine"}).options;
-    EXPECT_EQ(options.schemaDir, "/s");
-    EXPECT_EQ(options.registrationDir, "/r");
-    EXPECT_EQ(options.providerDir, "/mine");
+    EXPECT_EQ(options.directories.schemaDir, "/s");
+    EXPECT_EQ(options.directories.registrationDir, "/r");
+    EXPECT_EQ(options.directories.providerDirs, std::vector<std::string>{"/mine"});
 }
 
 TEST_F(CommandLineText, TakesEachCommand) {
@@ -108,7 +109,8 @@ TEST_F(CommandLineText, TakesArgumentsThatLookLikeCommandsOrOptions) {
 
 TEST_F(CommandLineText, AnEmptyValueBehindAnEqualsSignIsNotTheNextArgument) {
     EXPECT_EQ(refusal({"--tree=", "show"}), "--tree needs a name");
-    EXPECT_EQ(line({"--provider-dir=", "show"}).options.providerDir, "");
+    EXPECT_EQ(line({"--provider-dir=", "show"}).options.directories.providerDirs,
+              std::vector<std::string>{""});
     EXPECT_EQ(std::get<AssociatorsCommand>(line({"associators", "--role=", "P"}).command).role, "");
     EXPECT_EQ(std::get<GetCommand>(line({"get", "--", "--tree="}).command).path, "--tree=");
 }
@@ -228,6 +230,7 @@ TEST_F(CommandLineText, HelpNamesEveryCommandAndOption) {
                              "--schema-dir DIR",
                              "--registration-dir DIR",
                              "--provider-dir DIR",
+                             "--cim-schema PATH",
                              "CIMDHCP_SCHEMA_DIR",
                              "Exit status:",
                              "Examples:"}) {

@@ -44,13 +44,17 @@ TEST_F(DirectoriesFound, MoveWithTheOptions) {
     const Directories place = makeInstallation("place");
     const std::string other = makeInstallation("other").schema;
     Options options;
-    options.schemaDir = other;
+    options.directories.schemaDir = other;
     EXPECT_EQ(findDirectories(options, {place}), (Directories{other, other, place.providers}));
-    options.registrationDir = place.schema;
+    options.directories.registrationDir = place.schema;
     EXPECT_EQ(findDirectories(options, {place}),
               (Directories{other, place.schema, place.providers}));
-    options.providerDir = other;
-    EXPECT_EQ(findDirectories(options, {}), (Directories{other, place.schema, {other}}));
+    options.directories.providerDirs = {other, place.schema};
+    EXPECT_EQ(findDirectories(options, {}),
+              (Directories{other, place.schema, {other, place.schema}}));
+    options.directories.cimSchema = root_ / "cim_schema_2.41.0.mof";
+    writeFile(*options.directories.cimSchema, "");
+    EXPECT_EQ(findDirectories(options, {}).cimSchema, *options.directories.cimSchema);
 }
 
 TEST_F(DirectoriesFound, NameThePlacesWhereTheyWereNot) {
@@ -64,7 +68,7 @@ TEST_F(DirectoriesFound, NameThePlacesWhereTheyWereNot) {
 TEST_F(DirectoriesFound, MustExistWhenNamed) {
     const Directories place = makeInstallation("place");
     Options options;
-    options.providerDir = root_ / "missing";
+    options.directories.providerDirs = {place.schema, root_ / "missing"};
     EXPECT_EQ(
         refusal([&] { return findDirectories(options, {place}); }),
         root_ / "missing" + ": no such directory (from --provider-dir or CIMDHCP_PROVIDER_DIR)");

@@ -48,6 +48,36 @@ TEST(RegistrationFiles, MustBeThere) {
               directory / "missing" + ": No such file or directory");
 }
 
+TEST(CimSchemaFile, IsTheOneOfItsDirectory) {
+    const TemporaryDirectory directory;
+    for (const char* name : {"qualifiers.mof", "cim_schema_2.41.0.txt", "cim_schema_2.41.0.mof"}) {
+        writeFile(directory / name, "");
+    }
+    const fs::path file = directory / "cim_schema_2.41.0.mof";
+    EXPECT_EQ(cimSchemaFile(directory.path()), file);
+    EXPECT_EQ(cimSchemaFile(file), file);
+    EXPECT_EQ(cimSchemaFile(directory / "qualifiers.mof"), directory / "qualifiers.mof");
+}
+
+TEST(CimSchemaFile, MustBeOne) {
+    const TemporaryDirectory directory;
+    const std::string from = " (from --cim-schema or CIMDHCP_CIM_SCHEMA)";
+    const auto refused = [&](const std::string& place) {
+        return refusal([&] { return cimSchemaFile(place); });
+    };
+    EXPECT_EQ(refused(directory / "missing"),
+              directory / "missing" + ": no such file or directory" + from);
+    EXPECT_EQ(refused(directory.path()),
+              directory.path().string() +
+                  ": neither CIM_Schema.mof nor cim_schema_VERSION.mof is in it" + from);
+    writeFile(directory / "CIM_Schema.mof", "");
+    writeFile(directory / "cim_schema_2.41.0.mof", "");
+    EXPECT_EQ(refused(directory.path()),
+              directory.path().string() +
+                  ": both CIM_Schema.mof and cim_schema_2.41.0.mof are in it; name the file" +
+                  from);
+}
+
 TEST(ExecutableFile, IsThisTest) {
     EXPECT_EQ(executableFile().filename(), "cimdhcp_test");
 }

@@ -10,6 +10,10 @@ namespace test {
 
 namespace {
 
+/// What is not known of an element, and told as such: the standard schema has defaults.
+const std::string unknownStates =
+    ",EnabledState=,RequestedState=,EnabledDefault=,TransitioningToState=";
+
 std::string quoted(const std::string& text) {
     return '"' + text + '"';
 }
@@ -133,7 +137,9 @@ ExpectedMachine::ExpectedMachine(const ExpectedClasses& classes, const std::stri
         return;
     }
     const std::string keys = key("CreationClassName", system) + ',' + key("Name", host);
-    add(system, keys, keys + ',' + key("ElementName", host) + R"(,NameFormat="Other",Dedicated=0)");
+    add(system, keys,
+        keys + ',' + key("ElementName", host) + R"(,NameFormat="Other",Dedicated=0)" +
+            unknownStates);
     for (const Interface& interface : interfaces) {
         addInterface(interface);
     }
@@ -165,7 +171,7 @@ void ExpectedMachine::addInterface(const Interface& interface) {
     const std::string ipKeys = accessPoint(ipEndpoint, name);
     add(ipEndpoint, ipKeys,
         ipKeys + ',' + key("ElementName", name) + R"(,NameFormat="NICName",ProtocolIFType=4096,)" +
-            key("IPv4Address", interface.address) + ",AddressOrigin=4");
+            key("IPv4Address", interface.address) + ",AddressOrigin=4" + unknownStates);
     const std::string assignmentKeys = key("InstanceID", "Computer%" + name + "%dhcp");
     add(assignment, assignmentKeys,
         assignmentKeys + ',' + key("ElementName", name) + ",AddressOrigin=4");
@@ -175,7 +181,7 @@ void ExpectedMachine::addInterface(const Interface& interface) {
             key("CreationClassName", endpoint) +
             R"(,Description="Ethernet interface",EnabledState=2,)" + key("Name", name) +
             R"(,NameFormat="NICName",ProtocolIFType=1,OtherTypeDescription="DHCP",)"
-            "ClientState=8,OptionsReceived=8,14,17");
+            "ClientState=8,OptionsReceived=8,14,17,EnabledDefault=,TransitioningToState=");
     const std::string capabilityKeys = key("InstanceID", name);
     add(capabilities, capabilityKeys,
         capabilityKeys + ',' + key("ElementName", name) +
@@ -183,7 +189,7 @@ void ExpectedMachine::addInterface(const Interface& interface) {
     const std::string serverKeys = accessPoint(server, name + "_IPv4");
     add(server, serverKeys,
         R"(ElementName="DHCP Server",)" + key("AccessInfo", interface.server) +
-            ",InfoFormat=3,AccessContext=7," + serverKeys);
+            ",InfoFormat=3,AccessContext=7," + serverKeys + unknownStates);
     const std::string settingKeys = key("InstanceID", "Computer%" + name);
     add(setting, settingKeys,
         settingKeys + ',' + key("ElementName", name) + ",AddressOrigin=4," +
@@ -196,8 +202,7 @@ void ExpectedMachine::addInterface(const Interface& interface) {
         return role + "=root/cimv2:" + object;
     };
     const std::string systemPath = objects_[system].front().path;
-    // The path of the system has a host, before which wbemcli writes no colon.
-    const std::string ofHost = "Antecedent=" + host_ + "/root/cimv2" + systemPath;
+    const std::string ofHost = reference("Antecedent", systemPath);
     const std::string endpointPath = path(endpoint, endpointKeys);
     const std::string serverPath = path(server, serverKeys);
     const std::string settingPath = path(setting, settingKeys);
@@ -206,32 +211,23 @@ void ExpectedMachine::addInterface(const Interface& interface) {
                                reference("Capabilities", path(capabilities, capabilityKeys));
     add("QVXZR_DHCPElementCapabilities", served, served, endpointPath,
         path(capabilities, capabilityKeys));
-    const std::string hosted = ofHost + ',' + reference("Dependent", endpointPath);
-    add("QVXZR_HostedDHCPPoint", hosted, hosted, systemPath, endpointPath);
+    const std::string dependent = reference("Dependent", endpointPath);
+    add("QVXZR_HostedDHCPPoint", dependent + ',' + ofHost, ofHost + ',' + dependent, systemPath,
+        endpointPath);
     const std::string hostedServer = reference("Dependent", serverPath);
     add("QVXZR_DHCPRemoteHostedAccessPoint", hostedServer + ',' + ofHost,
         ofHost + ',' + hostedServer, systemPath, serverPath);
-    // The neighbour's path with its keys in another order, which is the same path.
-    const std::string ip = reference(
-        "Antecedent", path(ipEndpoint, key("Name", name) + ',' + key("SystemName", host_) + ',' +
-                                           key("CreationClassName", ipEndpoint) + ',' +
-                                           key("SystemCreationClassName", system)));
-    const std::string dependent = reference("Dependent", endpointPath);
+    const std::string ip = reference("Antecedent", path(ipEndpoint, ipKeys));
     add("QVXZR_SAPSAPDependency", dependent + ',' + ip, ip + ',' + dependent,
         path(ipEndpoint, ipKeys), endpointPath);
-    const std::string available =
-        reference("Antecedent", serverPath) + ',' +
-        reference("Dependent", path(endpoint, key("Name", name) + ',' + key("SystemName", host_) +
-                                                  ',' + key("SystemCreationClassName", system) +
-                                                  ',' + key("CreationClassName", endpoint)));
+    const std::string available = reference("Antecedent", serverPath) + ',' + dependent;
     add(serverOfElement, available, available + ",OrderOfAccess=1", serverPath, endpointPath);
     const std::string part = reference("PartComponent", settingPath);
     const std::string group = reference("GroupComponent", path(assignment, assignmentKeys));
     add("QVXZR_DHCPOrderedComponent", part + ',' + group,
         group + ',' + part + ",AssignedSequence=1", path(assignment, assignmentKeys), settingPath);
     const std::string data = reference("SettingData", settingPath);
-    const std::string element =
-        reference("ManagedElement", path(endpoint, ofSystem + ',' + key("Name", name)));
+    const std::string element = reference("ManagedElement", endpointPath);
     add("QVXZR_DHCPElementSettingData", data + ',' + element, element + ',' + data + ",IsCurrent=1",
         endpointPath, settingPath);
 }

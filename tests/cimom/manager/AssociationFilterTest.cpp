@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include "cimom/ClassDeclaration.h"
 #include "cimom/ClassRepository.h"
 #include "cimom/Instance.h"
 #include "cimom/ObjectPathText.h"
@@ -39,6 +40,32 @@ TEST_F(AssociationFilter, RoleIsTheReferenceThatNamesTheObject) {
     EXPECT_FALSE(playsRole(one, l1, "Far", repository));
     EXPECT_FALSE(playsRole(one, l1, "Middle", repository));
     EXPECT_TRUE(playsRole(one, l1, std::nullopt, repository));
+    EXPECT_FALSE(playsRole(one, parseObjectPath("Test_Left.Id=\"l3\""), std::nullopt, repository));
+}
+
+TEST_F(AssociationFilter, ClassesCanBeConnectedByTheReferencesOfTheAssociation) {
+    repository.load(BROKER_TEST_DIR "/stranger/schema/Stranger.mof");
+    const ClassDeclaration& tie = *repository.find("Stranger_Link");
+    const auto can = [&](const std::optional<std::string>& source,
+                         const std::optional<std::string>& other, const char* role = nullptr,
+                         const char* resultRole = nullptr) {
+        const auto named = [](const char* name) {
+            return name == nullptr ? std::nullopt : std::optional<std::string>(name);
+        };
+        return canConnect(tie, source, other, named(role), named(resultRole), repository);
+    };
+    EXPECT_TRUE(can("Stranger_Left", "Stranger_Right"));
+    EXPECT_TRUE(can("Stranger_Right", "Stranger_Left"));
+    EXPECT_FALSE(can("Stranger_Left", "Stranger_Left"));
+    EXPECT_TRUE(can("Stranger_Thing", "Stranger_Thing"));  // parents of both
+    EXPECT_FALSE(can("Stranger_Left", "Stranger_Apart"));
+    EXPECT_FALSE(can("Stranger_Apart", std::nullopt));
+    EXPECT_TRUE(can("Stranger_Left", std::nullopt, "near", "FAR"));
+    EXPECT_FALSE(can("Stranger_Left", std::nullopt, "Far"));
+    EXPECT_FALSE(can("Stranger_Left", std::nullopt, nullptr, "Near"));
+    EXPECT_FALSE(can(std::nullopt, std::nullopt, "Near", "Near"));
+    EXPECT_TRUE(canConnect(*repository.find("Stranger_Left"), "Stranger_Apart", std::nullopt,
+                           std::nullopt, std::nullopt, repository));
 }
 
 TEST_F(AssociationFilter, ConnectionNeedsTwoDifferentReferences) {

@@ -59,6 +59,42 @@ TEST_F(Registrations, ReadsSectionsInTheirOrder) {
               (Registration{"Second_Class", "Two", "Library", false, true, {"root/cimv2"}}));
 }
 
+TEST_F(Registrations, ReadsAClassInALine) {
+    const auto read = this->read(
+        "# class namespace provider location types\n"
+        "First_Class root/cimv2 One Library instance association\r\n"
+        "  First_Class\t/root/interop/ Two  Other_Library  method\n"
+        "[Second_Class]\nprovider: P\nlocation: L\ntype: instance\nnamespace: n\n");
+    ASSERT_EQ(read.size(), 3U);
+    EXPECT_EQ(read[0], (Registration{"First_Class", "One", "Library", true, true, {"root/cimv2"}}));
+    EXPECT_EQ(read[1], (Registration{
+                           "First_Class", "Two", "Other_Library", false, false, {"root/interop"}}));
+    EXPECT_EQ(read[2], (Registration{"Second_Class", "P", "L", true, false, {"n"}}));
+}
+
+TEST_F(Registrations, LinesAboutProcessesMeanNothing) {
+    const std::string section = "[A_B]\nprovider: P\nlocation: L\ntype: instance\nnamespace: n\n";
+    EXPECT_EQ(read(section + "group: a group\nUNLOAD: never\nuser: root\nparameters: a=b c:d\n"
+                             "parameters:\n"),
+              read(section));
+}
+
+TEST_F(Registrations, ErrorsOfALineTellItsForm) {
+    const auto form = [](const std::string& line) {
+        return "1: \"" + line +
+               "\" is neither [CLASS] nor a line of the form CLASS NAMESPACE PROVIDER LOCATION "
+               "TYPE...";
+    };
+    for (const std::string line :
+         {"A_B", "A_B root/cimv2 P", "A_B root/cimv2 P L", "A-B root/cimv2 P L instance"}) {
+        EXPECT_EQ(failure(line + "\n"), form(line));
+    }
+    EXPECT_EQ(failure("A_B n P L everything\n"), "1: \"everything\" is not a type of provider");
+    EXPECT_EQ(failure("A_B / P L instance\n"), "1: \"/\" is not a namespace");
+    EXPECT_EQ(failure("A_B n P ../L instance\n"),
+              "1: \"../L\" is not a name for \"location:\": blanks and \"/\" cannot be in it");
+}
+
 TEST_F(Registrations, EmptyFileHasNone) {
     EXPECT_TRUE(read("\n# nothing\n").empty());
 }

@@ -58,6 +58,24 @@ class ClassRepositoryTest : public testing::Test {
     ClassRepository repository_;
 };
 
+TEST_F(ClassRepositoryTest, WhatIsKeptStandsAgainstFurtherDeclarations) {
+    repository_.loadText(qualifierTypes, "q.mof");
+    repository_.loadText("class T_A { uint8 First; };", "a.mof");
+    repository_.keepDeclared();
+    // Of the kept ones, another form is passed over.
+    repository_.loadText(
+        "Qualifier KEY : string, Scope(any);\nclass t_a { uint8 Second; };\n"
+        "class T_B : T_A { [Key] uint8 Third; };",
+        "b.mof");
+    EXPECT_EQ(names("T_A"), (std::vector<std::string>{"T_A", "T_B"}));
+    EXPECT_NE(repository_.find("T_A")->property("First"), nullptr);
+    EXPECT_EQ(repository_.find("T_A")->property("Second"), nullptr);
+    EXPECT_TRUE(repository_.find("T_B")->property("Third")->isKey());
+    // What came later is still declared once only.
+    EXPECT_EQ(errorOf([&] { repository_.loadText("class T_B { };", "c.mof"); }),
+              "c.mof:1:7: class T_B is declared twice");
+}
+
 TEST_F(ClassRepositoryTest, AnEmptyRepositoryKnowsNothing) {
     EXPECT_EQ(repository_.find("A_B"), nullptr);
     EXPECT_FALSE(repository_.isA("A_B", "A_B"));

@@ -212,7 +212,8 @@ INSTANTIATE_TEST_SUITE_P(
         WrongClass{"class T_A { uint8 P = { 1 }; };", "1:23: one value is needed here, not a list"},
         WrongClass{"class T_A { datetime P = \"now\"; };",
                    "1:26: this is not a value of type datetime"},
-        WrongClass{"Qualifier key : boolean, Scope(any);", "1:11: qualifier key is declared twice"},
+        WrongClass{"Qualifier key : boolean, Scope(any);",
+                   "1:11: qualifier key is declared twice, in different ways"},
         WrongClass{"Qualifier New : uint8 = TRUE, Scope(any);",
                    "1:25: this is not a value of type uint8"}));
 

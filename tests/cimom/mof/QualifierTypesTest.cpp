@@ -90,7 +90,35 @@ TEST_F(QualifierTypesTest, RefusesWhatIsUnknownMisplacedDoubledOrOfAnotherType) 
 
 TEST_F(QualifierTypesTest, RefusesATypeThatIsDeclaredTwice) {
     EXPECT_EQ(errorOf([&] { declare("kEY", Type::string, {}, {}); }),
-              "q.mof:1:11: qualifier kEY is declared twice");
+              "q.mof:1:11: qualifier kEY is declared twice, in different ways");
+}
+
+TEST_F(QualifierTypesTest, TheSameDeclarationOnceMoreChangesNothing) {
+    types_.add(
+        {"Two", {1, 11}, Type::string, false, {}, {MofScope::property, MofScope::method}, {}},
+        "q.mof");
+    types_.add({"TWO",
+                {1, 11},
+                Type::string,
+                false,
+                {},
+                {MofScope::method, MofScope::property},
+                {true, true, false}},
+               "q.mof");
+    EXPECT_EQ(resolve({written("Two")}).front().name, "Two");
+    EXPECT_EQ(
+        errorOf([&] {
+            declare("Two", Type::string, {false, true, {}}, {MofScope::property, MofScope::method});
+        }),
+        "q.mof:1:11: qualifier Two is declared twice, in different ways");
+    EXPECT_EQ(errorOf([&] { declare("Two", Type::string, {}, {MofScope::property}); }),
+              "q.mof:1:11: qualifier Two is declared twice, in different ways");
+}
+
+TEST_F(QualifierTypesTest, KeptTypesStandAgainstOthers) {
+    types_.keepDeclared();
+    declare("Key", Type::string, {true, true, true}, {MofScope::any});
+    EXPECT_TRUE(isTrue(&resolve({written("Key")}).front()));
 }
 
 TEST_F(QualifierTypesTest, OnlyQualifiersToSubclassAreInherited) {

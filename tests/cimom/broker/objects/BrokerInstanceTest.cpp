@@ -1,5 +1,7 @@
 #include "broker/objects/BrokerInstance.h"
 
+#include <array>
+
 #include "kit/BrokerFixture.h"
 
 namespace cimom::test {
@@ -12,6 +14,14 @@ class BrokerInstance : public TestBroker {
     CMPIrc set(const char* name, CMPIType type) const {
         const CMPIValue value{};
         return instance->ft->setProperty(instance, name, &value, type).rc;
+    }
+
+    /// The value of the key Id in the path that the instance hands out; "none" without it.
+    static std::string idOf(const CMPIInstance* one) {
+        const CMPIObjectPath* const path = one->ft->getObjectPath(one, nullptr);
+        CMPIStatus rc{};
+        const CMPIData key = path->ft->getKey(path, "Id", &rc);
+        return rc.rc == CMPI_RC_OK ? text(key.value.string) : "none";
     }
 };
 
@@ -108,6 +118,47 @@ TEST_F(BrokerInstance, PathIsHandedOutAgainWhileItIsNotChanged) {
     CMPIObjectPath* const second = instance->ft->getObjectPath(instance, nullptr);
     EXPECT_NE(second, first);
     EXPECT_EQ(text(second->ft->getClassName(second, nullptr)), "Test_Types");
+}
+
+TEST_F(BrokerInstance, KeySetAsPropertyIsInThePath) {
+    EXPECT_EQ(idOf(instance), "none");
+    for (const char* const id : {"first", "second"}) {
+        const CMPIValue value = valueOf(newString(id));
+        ASSERT_EQ(instance->ft->setProperty(instance, "ID", &value, CMPI_string).rc, CMPI_RC_OK);
+        EXPECT_EQ(idOf(instance), id);
+    }
+    instance->ft->setPropertyFilter(instance, std::array<const char*, 1>{nullptr}.data(), nullptr);
+    EXPECT_EQ(idOf(instance), "second");
+    const CMPIValue value = valueOf(newString("hidden"));
+    instance->ft->setProperty(instance, "Id", &value, CMPI_string);
+    EXPECT_EQ(idOf(instance), "hidden");
+    EXPECT_EQ(instance->ft->getPropertyCount(instance, nullptr), 0U);
+    CMPIInstance* const clone = instance->ft->clone(instance, nullptr);
+    clone->ft->setProperty(clone, "Id", nullptr, CMPI_string);
+    EXPECT_EQ(idOf(clone), "none");
+    clone->ft->release(clone);
+    EXPECT_EQ(idOf(instance), "hidden");
+}
+
+TEST_F(BrokerInstance, KeyOfThePathIsNotChangedByAProperty) {
+    CMPIObjectPath* const path = newPath("Test_Types");
+    CMPIValue value = valueOf(newString("own"));
+    path->ft->addKey(path, "Id", &value, CMPI_string);
+    const CMPIInstance* const named = mb->eft->newInstance(mb, path, nullptr);
+    value = valueOf(newString("other"));
+    named->ft->setProperty(named, "Id", &value, CMPI_string);
+    EXPECT_EQ(idOf(named), "own");
+    named->ft->setProperty(named, "Id", nullptr, CMPI_string);
+    EXPECT_EQ(idOf(named), "own");
+}
+
+TEST_F(BrokerInstance, AnotherPathKeepsKeysOfPropertiesThatItsClassHas) {
+    const CMPIValue value = valueOf(newString("mine"));
+    instance->ft->setProperty(instance, "Id", &value, CMPI_string);
+    instance->ft->setObjectPath(instance, newPath("Test_Left"));
+    EXPECT_EQ(idOf(instance), "mine");
+    instance->ft->setObjectPath(instance, newPath("Test_Inner"));
+    EXPECT_EQ(idOf(instance), "none");
 }
 
 TEST_F(BrokerInstance, EmptyFilterDropsEverything) {
