@@ -19,7 +19,8 @@ void setNull(const CMPIInstance* instance, const Property& property) {
 
 void copy(const CMPIInstance* from, const CMPIInstance* to, const char* name) {
     const CMPIData data = from->ft->getProperty(from, name, nullptr);
-    static_cast<void>(to->ft->setProperty(to, name, &data.value, data.type));
+    static_cast<void>(
+        to->ft->setProperty(to, name, isNull(data) ? nullptr : &data.value, data.type));
 }
 
 /// The listed properties in an instance of their own.
@@ -32,7 +33,7 @@ const CMPIInstance* listed(const Request& request, const ServedClass& served,
             CMPIString* name = nullptr;
             whole->ft->getPropertyAt(whole, index, &name, nullptr);
             const char* text = name == nullptr ? nullptr : name->ft->getCharPtr(name, nullptr);
-            if (text != nullptr && lists(properties, text) && hasValue(whole, text)) {
+            if (text != nullptr && lists(properties, text)) {
                 copy(whole, instance, text);
             }
         }

@@ -33,9 +33,13 @@ std::vector<Object> objectsAt(const Request& request, const End& end, Form form,
     return objects;
 }
 
+/// The table of CMPI takes references that it does not change as if it might.
+CMPIObjectPath* asArgument(const CMPIObjectPath* path) {
+    return const_cast<CMPIObjectPath*>(path);  // NOLINT(cppcoreguidelines-pro-type-const-cast)
+}
+
 void setReference(const CMPIObjectPath* reference, const char* role, CMPIObjectPath* path) {
-    // The table of CMPI takes references that it does not change as if it might.
-    if (!ProviderUtilities::setKeyProperty(path, role, const_cast<CMPIObjectPath*>(reference))) {
+    if (!ProviderUtilities::setKeyProperty(path, role, asArgument(reference))) {
         throw Refusal(CMPI_RC_ERR_FAILED,
                       std::string("the object manager takes no reference as ") + role);
     }
@@ -125,7 +129,7 @@ Object objectOf(const Request& request, const Link& link, Form form) {
     bool complete = true;
     for (std::size_t end = 0; end < association.ends.size(); ++end) {
         CMPIValue value{};
-        value.ref = const_cast<CMPIObjectPath*>(link.paths.at(end));
+        value.ref = asArgument(link.paths.at(end));
         complete =
             complete &&
             instance->ft->setProperty(instance, association.ends.at(end).role, &value, CMPI_ref)

@@ -183,12 +183,23 @@ class Examination {
             "install the provider, or name its directory with --provider-dir");
     }
 
-    /// Calls that need the one and the other factory.
     void lookAtFactories(const std::string& location) {
+        std::vector<std::string> seen;
+        for (const cimom::Registration& each : client_->registrations()) {
+            if (each.location == location &&
+                std::find(seen.begin(), seen.end(), each.provider) == seen.end()) {
+                seen.push_back(each.provider);
+                lookAtFactoriesOf(each.provider);
+            }
+        }
+    }
+
+    /// Calls that need the one and the other factory of a provider.
+    void lookAtFactoriesOf(const std::string& provider) {
         const cimom::Registration* instance = nullptr;
         const cimom::Registration* association = nullptr;
         for (const cimom::Registration& each : client_->registrations()) {
-            if (each.location == location && !each.nameSpaces.empty()) {
+            if (each.provider == provider && !each.nameSpaces.empty()) {
                 instance = instance == nullptr && each.instance ? &each : instance;
                 association = association == nullptr && each.association ? &each : association;
             }
