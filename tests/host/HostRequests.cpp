@@ -1,9 +1,11 @@
 #include "HostRequests.h"
 
 #include <algorithm>
+#include <memory>
 
 #include "cimom/ObjectPathText.h"
 #include "cimom/Results.h"
+#include "manager/PathMatch.h"
 
 namespace strict {
 
@@ -92,6 +94,31 @@ StrictHost::Response ofPath(const cimom::ObjectPath& path, StrictHost::Response 
     return response;
 }
 
+/// Whether a reference in the keys of an association names the object.
+bool isEnd(const cimom::ObjectPath& object, const cimom::ObjectPath& association,
+           const cimom::ClassRepository& repository) {
+    return std::any_of(
+        association.keys.begin(), association.keys.end(), [&](const cimom::NamedValue& key) {
+            const cimom::Scalar* scalar = key.value.scalar();
+            const auto* end = scalar == nullptr
+                                  ? nullptr
+                                  : std::get_if<std::shared_ptr<const cimom::ObjectPath>>(scalar);
+            return end != nullptr && cimom::sameObject(**end, object, repository);
+        });
+}
+
+/// The associations of which the source is an end, of all that references deliver: the
+/// provider gives more, and the embedded object manager leaves the others out.
+StrictHost::Response ofSource(const cimom::ObjectPath& source, StrictHost::Response response,
+                              const cimom::ClassRepository& repository) {
+    std::erase_if(response.paths,
+                  [&](const cimom::ObjectPath& path) { return !isEnd(source, path, repository); });
+    std::erase_if(response.instances, [&](const cimom::Instance& instance) {
+        return !isEnd(source, instance.path, repository);
+    });
+    return response;
+}
+
 const char* nameOf(Operation operation) {
     switch (operation) {
         case Operation::enumerateNames:
@@ -162,9 +189,11 @@ Texts ask(StrictHost& host, const HostRequest& request, const char** properties)
         case Operation::associators:
             return textsOf(operation, host.associators(path, filter, properties));
         case Operation::referenceNames:
-            return textsOf(operation, host.referenceNames(path, filter));
+            return textsOf(operation,
+                           ofSource(path, host.referenceNames(path, filter), host.repository()));
         case Operation::references:
-            return textsOf(operation, host.references(path, filter, properties));
+            return textsOf(operation, ofSource(path, host.references(path, filter, properties),
+                                               host.repository()));
     }
     return {};
 }
