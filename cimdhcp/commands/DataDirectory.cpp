@@ -107,7 +107,7 @@ void lookAtDataDirectory(const std::string& directory, std::vector<Finding>& fin
     } else if (error && error != std::errc::no_such_file_or_directory) {
         const bool loop = error == std::errc::too_many_symbolic_link_levels;
         findings.push_back(
-            {Verdict::bad, what, printable(directory) + ": " + error.message(),
+            {Verdict::bad, dataDirectory, printable(directory) + ": " + error.message(),
              loop ? "remove the link that leads to itself, and make a directory there"
                   : "make it a directory that this user may look into, or set DATA_DIR"});
     } else {
