@@ -2,6 +2,8 @@
 
 #include <cmpidt.h>
 
+#include <cstdint>
+#include <optional>
 #include <span>
 #include <string_view>
 
@@ -17,9 +19,10 @@ struct Property {
     const char* name;
     CMPIType type;
     Presence presence;
-    /// The standard schema declares a default, which some object managers show for a
-    /// property that is not set.
-    bool hasDefault = false;
+    /// The default that the first of the standard classes with this property declares. Some
+    /// object managers show it for a property that is not set, and send it for one that a
+    /// client did not name.
+    std::optional<std::uint16_t> standardDefault = std::nullopt;
 };
 
 /// Who has the instances of a class.

@@ -31,16 +31,25 @@ const CMPIInstance* listed(const Request& request, const ServedClass& served,
         const CMPICount count = whole->ft->getPropertyCount(whole, nullptr);
         for (CMPICount index = 0; index < count; ++index) {
             CMPIString* name = nullptr;
-            whole->ft->getPropertyAt(whole, index, &name, nullptr);
+            const CMPIData data = whole->ft->getPropertyAt(whole, index, &name, nullptr);
             const char* text = name == nullptr ? nullptr : name->ft->getCharPtr(name, nullptr);
-            if (text != nullptr && lists(properties, text)) {
+            if (text == nullptr) {
+                continue;
+            }
+            if (lists(properties, text)) {
                 copy(whole, instance, text);
+            } else {
+                // A null, so that some object managers do not show the schema's default.
+                static_cast<void>(instance->ft->setProperty(instance, text, nullptr, data.type));
             }
         }
     }
     for (const Property& property : served.properties) {
         // Some object managers fail on an instance that lacks a reference of its path.
         if (property.type != CMPI_ref && !lists(properties, property.name)) {
+            if (property.standardDefault) {
+                setNull(instance, property);
+            }
             continue;
         }
         if (property.presence != Presence::never && hasValue(whole, property.name)) {
@@ -73,7 +82,7 @@ const CMPIInstance* completed(const Request& request, const ServedClass& served,
     }
     for (const Property& property : served.properties) {
         const bool unset =
-            property.hasDefault &&
+            property.standardDefault &&
             (property.presence == Presence::never ||
              (property.presence == Presence::sometimes && !hasValue(instance, property.name)));
         if (unset) {

@@ -58,12 +58,17 @@ std::string interfaceOf(const CMPIInstance* instance) {
     return textOf(propertyOf(instance, "ElementName")).value_or("");
 }
 
+/// Whether a value may be one that the object manager has put where the client sent none.
+bool isFilledIn(const Property& property, const CMPIData& data) {
+    return property.standardDefault && numberOf(data) == std::uint64_t{*property.standardDefault};
+}
+
 /// Whether the writable property is among those that would change. Throws Refusal when
 /// another one would.
 bool changes(const ServedClass& served, const CMPIInstance* present, const CMPIInstance* wanted,
-             const std::vector<std::string>& names) {
+             const char** properties) {
     bool change = false;
-    for (const std::string& name : names) {
+    for (const std::string& name : namedProperties(wanted, properties)) {
         const Property* property = findProperty(served, name);
         if (property == nullptr) {
             throw Refusal(CMPI_RC_ERR_NO_SUCH_PROPERTY,
@@ -73,7 +78,8 @@ bool changes(const ServedClass& served, const CMPIInstance* present, const CMPII
         const CMPIData after = propertyOf(wanted, property->name);
         const bool writable =
             served.writable != nullptr && equalNames(served.writable, property->name);
-        if (!writable && !sameValue(before, after)) {
+        if (!writable && !sameValue(before, after) &&
+            (properties != nullptr || !isFilledIn(*property, after))) {
             throw Refusal(CMPI_RC_ERR_NOT_SUPPORTED, std::string("the property ") + property->name +
                                                          " of " + served.name +
                                                          " cannot be changed");
@@ -98,7 +104,7 @@ void modifyInstance(const Request& request, const CMPIInstance* wanted, const ch
     if (wanted == nullptr) {
         throw Refusal(CMPI_RC_ERR_INVALID_PARAMETER, "there is no instance to take values from");
     }
-    if (!changes(served, before.instance, wanted, namedProperties(wanted, properties))) {
+    if (!changes(served, before.instance, wanted, properties)) {
         return;
     }
     const std::string name = configurationName(propertyOf(wanted, served.writable));

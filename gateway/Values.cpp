@@ -99,6 +99,11 @@ std::optional<std::string> textOf(const CMPIData& data) {
     return std::nullopt;
 }
 
+std::optional<std::uint64_t> numberOf(const CMPIData& data) {
+    const std::optional<Whole> number = isNull(data) ? std::nullopt : wholeOf(data);
+    return number && !number->negative ? std::optional(number->bits) : std::nullopt;
+}
+
 bool sameValue(const CMPIData& one, const CMPIData& other) {
     if (isNull(one) || isNull(other)) {
         return isNull(one) && isNull(other);

@@ -2,6 +2,7 @@
 
 #include <cmpift.h>
 
+#include <cstdint>
 #include <optional>
 #include <string>
 
@@ -15,6 +16,9 @@ namespace ZR::DHCPClientGateway {
 
 /// The text of a text value; none for null and for other types.
 [[nodiscard]] std::optional<std::string> textOf(const CMPIData& data);
+
+/// The value of a whole number that is not negative; none for null and for other types.
+[[nodiscard]] std::optional<std::uint64_t> numberOf(const CMPIData& data);
 
 /// Whether two values are the same: texts, date-times, booleans, numbers whatever their
 /// types, and arrays of these. Two nulls are; values of other types are not.

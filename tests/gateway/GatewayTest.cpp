@@ -260,8 +260,8 @@ TEST_P(GatewayWith, PropertyListsAreApplied) {
     EXPECT_EQ(*instance.property("ConfigurationName"), Value::ofString("office"));
     EXPECT_EQ(*instance.property("InstanceID"), Value::ofString("Computer%eth0"));
     std::array<const char*, 1> none{nullptr};
-    for (const cimom::NamedValue& property :
-         host_.get(endpoint("eth0"), none.data()).instances.at(0).properties) {
+    const auto bare = host_.get(endpoint("eth0"), none.data()).instances.at(0);
+    for (const cimom::NamedValue& property : bare.properties) {
         EXPECT_TRUE(property.value.isNull()) << property.name;
     }
     std::array<const char*, 2> own{"AssignedSequence", nullptr};
