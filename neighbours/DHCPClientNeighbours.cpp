@@ -139,29 +139,28 @@ CMPIInstance* makeInstance(const NeighbourObject& object, const std::string& nam
     return complete ? instance : nullptr;
 }
 
-/// Throws Refusal unless the path has the keys of its class and no others.
-void requireKeys(const CMPIObjectPath* path, const std::string& className) {
+/// Throws Refusal when the path has a key that its class does not have. It need not have all:
+/// the exact provider asks for what is at the other end of an association by what it was
+/// given itself, and takes the first.
+void requireOwnKeys(const CMPIObjectPath* path, const std::string& className) {
     const auto names = keysOf(className);
-    for (const char* name : names) {
+    const auto known = std::count_if(names.begin(), names.end(), [path](const char* name) {
         std::string value;
-        if (!ProviderUtilities::getKeyProperty(path, name, value)) {
-            throw Refusal{CMPI_RC_ERR_INVALID_PARAMETER, std::string("The key ") + name + " of " +
-                                                             className +
-                                                             " is missing, or is not a text"};
-        }
-    }
-    if (ProviderUtilities::getKeyCount(path) != names.size()) {
-        throw Refusal{CMPI_RC_ERR_INVALID_PARAMETER,
-                      "The path has a key that " + className + " does not have"};
+        return ProviderUtilities::getKeyProperty(path, name, value);
+    });
+    if (ProviderUtilities::getKeyCount(path) != static_cast<std::size_t>(known)) {
+        throw Refusal{
+            CMPI_RC_ERR_INVALID_PARAMETER,
+            "The path has a key that " + className + " does not have, or one that is not a text"};
     }
 }
 
-/// Whether the object is the one that a path with all keys names.
+/// Whether the object agrees with all that a path names.
 bool agrees(const NeighbourObject& object, const CMPIObjectPath* path) {
     return equalNames(object.className, classNameOf(path)) &&
            std::all_of(object.keys.begin(), object.keys.end(), [path](const auto& key) {
                std::string value;
-               return ProviderUtilities::getKeyProperty(path, key.first.c_str(), value) &&
+               return !ProviderUtilities::getKeyProperty(path, key.first.c_str(), value) ||
                       value == key.second;
            });
 }
@@ -236,7 +235,7 @@ CMPIStatus getInstance(CMPIInstanceMI* /*mi*/, const CMPIContext* /*ctx*/, const
                        const CMPIObjectPath* path, const char** properties) {
     return serve(result, path, [&](const auto& objects, const std::string& nameSpace) {
         const std::string className = classNameOf(path);
-        requireKeys(path, className);
+        requireOwnKeys(path, className);
         const auto found =
             std::find_if(objects.begin(), objects.end(),
                          [path](const NeighbourObject& object) { return agrees(object, path); });
