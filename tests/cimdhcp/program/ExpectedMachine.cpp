@@ -157,7 +157,6 @@ void ExpectedMachine::add(const std::string& className, const std::string& keys,
                           const std::string& other) {
     associations_[className].push_back(
         {{className, className + '.' + keys, properties}, one, other});
-    associations_[className].back().shared = className == serverOfElement;
 }
 
 void ExpectedMachine::addInterface(const Interface& interface) {
@@ -272,10 +271,9 @@ std::vector<ExpectedMachine::Object> ExpectedMachine::associators(
             continue;
         }
         for (const Association& association : found->second) {
-            const bool shared = association.shared && of.className == endpoint;
             if (association.one == of.path) {
                 far.push_back(objectAt(association.other));
-            } else if (association.other == of.path || shared) {
+            } else if (association.other == of.path) {
                 far.push_back(objectAt(association.one));
             }
         }
@@ -300,12 +298,8 @@ std::vector<ExpectedMachine::Object> ExpectedMachine::references(
         if (found == associations_.end()) {
             continue;
         }
-        // Whichever server is named, the provider tells of its machine's first one.
-        const std::string& path =
-            of.className == server ? objects_.at(server).front().path : of.path;
         for (const Association& association : found->second) {
-            const bool shared = association.shared && of.className == endpoint;
-            if (association.one == path || association.other == path || shared) {
+            if (association.one == of.path || association.other == of.path) {
                 all.push_back(association.object);
             }
         }

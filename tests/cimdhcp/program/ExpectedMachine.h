@@ -70,8 +70,6 @@ class ExpectedMachine {
         Object object;
         std::string one;  ///< paths of its ends
         std::string other;
-        /// An endpoint is told of every server of the machine.
-        bool shared = false;
     };
 
     void add(const std::string& className, const std::string& keys, const std::string& properties);

@@ -160,7 +160,7 @@ TEST_F(ManyServers, ACimStatusIsAFailureOfItsServer) {
     EXPECT_EQ(ended.status, 4);
     EXPECT_THAT(ended.out, HasSubstr("== " + servers_[1]->url() + "\nroot/cimv2:" + path));
     EXPECT_EQ(ended.err, "cimdhcp: 1 of 2 servers failed:\n  " + servers_[0]->url() +
-                             ": CIM_ERR_NOT_FOUND: there is no root/cimv2:" + path +
+                             ": CIM_ERR_NOT_FOUND: there is no " + path +
                              "; \"cimdhcp names QVXZR_DHCPCapabilities\" lists what there is\n");
 }
 
