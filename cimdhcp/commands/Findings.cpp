@@ -81,7 +81,7 @@ bool isGood(const std::vector<Finding>& findings) noexcept {
 }
 
 Failure somethingIsWrong() {
-    return Failure(ExitStatus::notDone, "something is wrong; see the list");
+    return {ExitStatus::notDone, "something is wrong; see the list"};
 }
 
 }  // namespace cimdhcp

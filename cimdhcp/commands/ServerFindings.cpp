@@ -135,11 +135,11 @@ bool isInstanceOf(const cimom::Instance& instance, const cimom::ObjectPath& path
 /// The path of an instance that no machine has; none for a class whose keys are references.
 std::optional<cimom::ObjectPath> pathOfNothing(cimom::ObjectPath path) {
     for (const std::string_view name : {"InstanceID", "Name"}) {
-        for (cimom::NamedValue& key : path.keys) {
-            const cimom::Scalar* const scalar = key.value.scalar();
+        for (cimom::NamedValue& each : path.keys) {
+            const cimom::Scalar* const scalar = each.value.scalar();
             const auto* const text = scalar == nullptr ? nullptr : std::get_if<std::string>(scalar);
-            if (text != nullptr && cimom::sameName(key.name, name)) {
-                key.value = cimom::Value::ofString(*text + "-none");
+            if (text != nullptr && cimom::sameName(each.name, name)) {
+                each.value = cimom::Value::ofString(*text + "-none");
                 return path;
             }
         }
@@ -147,9 +147,9 @@ std::optional<cimom::ObjectPath> pathOfNothing(cimom::ObjectPath path) {
     return std::nullopt;
 }
 
-class Examination {
+class ServerExamination {
   public:
-    explicit Examination(Client& client) : client_(client) {}
+    explicit ServerExamination(Client& client) : client_(client) {}
 
     std::vector<Finding> examine() {
         for (const ServedClass& each : servedClasses) {
@@ -389,7 +389,7 @@ class Examination {
 }  // namespace
 
 std::vector<Finding> serverFindings(Client& client) {
-    return Examination(client).examine();
+    return ServerExamination(client).examine();
 }
 
 }  // namespace cimdhcp

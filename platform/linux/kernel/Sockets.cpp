@@ -19,7 +19,7 @@ namespace ZR::Live {
 namespace {
 
 constexpr std::uint16_t clientPort = 68;  // RFC 2131, section 4.1
-constexpr int hexadecimal = 16;
+constexpr int base16 = 16;
 constexpr std::uint16_t everyProtocol = ETH_P_ALL;
 constexpr std::uint16_t ipv4Protocol = ETH_P_IP;
 
@@ -62,8 +62,8 @@ std::optional<EndPoint> parseEndPoint(std::string_view text) {
     if (colon == std::string_view::npos) {
         return std::nullopt;
     }
-    const auto address = parseNumber<std::uint32_t>(text.substr(0, colon), hexadecimal);
-    const auto port = parseNumber<std::uint16_t>(text.substr(colon + 1), hexadecimal);
+    const auto address = parseNumber<std::uint32_t>(text.substr(0, colon), base16);
+    const auto port = parseNumber<std::uint16_t>(text.substr(colon + 1), base16);
     if (!address || !port) {
         return std::nullopt;
     }
@@ -133,8 +133,7 @@ std::vector<PacketSocket> parsePacketSockets(std::string_view text) {
     std::vector<PacketSocket> sockets;
     // Address, references, type, protocol, link, running, memory, user, inode.
     forEachLine<9>(text, [&](const std::array<std::string_view, 9>& words) {
-        const std::uint16_t protocol =
-            parseNumber<std::uint16_t>(words[3], hexadecimal).value_or(0);
+        const std::uint16_t protocol = parseNumber<std::uint16_t>(words[3], base16).value_or(0);
         const auto link = parseNumber<std::uint32_t>(words[4]);
         const auto inode = parseNumber<std::uint64_t>(words[8]);
         const bool heard = protocol == everyProtocol || protocol == ipv4Protocol;
