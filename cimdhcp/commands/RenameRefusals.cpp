@@ -12,7 +12,7 @@ namespace cimdhcp {
 
 namespace {
 
-constexpr std::string_view key = ZR::InterfaceFile::configurationName;
+constexpr std::string_view nameKey = ZR::InterfaceFile::configurationName;
 constexpr std::size_t longestName = 490;
 constexpr std::size_t longestLine = 510;
 
@@ -101,19 +101,20 @@ std::vector<std::string> refusalsOfName(std::string_view name) {
 }
 
 std::vector<std::string> refusalsOfContent(std::string_view content) {
-    const std::string assignment = std::string(key) + '=';
+    const std::string assignment = std::string(nameKey) + '=';
     std::vector<std::string> refusals;
     forEachLine(content, [&](std::size_t number, std::string_view line) {
         const std::string where = "line " + std::to_string(number) + ", " + inQuotes(line) + ", ";
         // What stands behind a zero byte is not looked at.
-        const bool contains = line.substr(0, line.find('\0')).find(key) != std::string_view::npos;
+        const bool contains =
+            line.substr(0, line.find('\0')).find(nameKey) != std::string_view::npos;
         if (line.size() > longestLine) {
             refusals.push_back(where + "has " + std::to_string(line.size()) +
                                " bytes: it would be taken for several lines of at most 511, and "
                                "each of these that contains " +
-                               std::string(key) + " replaced by the new name's line");
+                               std::string(nameKey) + " replaced by the new name's line");
         } else if (contains && !line.starts_with(assignment)) {
-            refusals.push_back(where + "contains " + std::string(key) +
+            refusals.push_back(where + "contains " + std::string(nameKey) +
                                ": the whole line would be replaced by the new name's line");
         }
     });
@@ -127,12 +128,12 @@ bool lacksLineEnd(std::string_view content) {
 std::string namesIn(std::string_view content) {
     std::string text;
     for (const ZR::PropertyLine& line : ZR::parsePropertyLines(content)) {
-        if (line.key == key) {
+        if (line.key == nameKey) {
             text += (text.empty() ? "" : ", and ") + line.key + '=' + printable(line.value) +
                     " in line " + std::to_string(line.line);
         }
     }
-    return text.empty() ? "no " + std::string(key) : text;
+    return text.empty() ? "no " + std::string(nameKey) : text;
 }
 
 }  // namespace cimdhcp
