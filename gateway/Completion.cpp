@@ -1,7 +1,7 @@
 #include "Completion.h"
 
 #include "Values.h"
-#include "zrcommon/Strings.h"
+#include "providerutilities/ProviderUtilities.h"
 
 namespace ZR::DHCPClientGateway {
 
@@ -36,7 +36,7 @@ const CMPIInstance* listed(const Request& request, const ServedClass& served,
             if (text == nullptr) {
                 continue;
             }
-            if (lists(properties, text)) {
+            if (ProviderUtilities::isListed(properties, text)) {
                 copy(whole, instance, text);
             } else {
                 // A null, so that some object managers do not show the schema's default.
@@ -46,7 +46,7 @@ const CMPIInstance* listed(const Request& request, const ServedClass& served,
     }
     for (const Property& property : served.properties) {
         // Some object managers fail on an instance that lacks a reference of its path.
-        if (property.type != CMPI_ref && !lists(properties, property.name)) {
+        if (property.type != CMPI_ref && !ProviderUtilities::isListed(properties, property.name)) {
             if (property.standardDefault) {
                 setNull(instance, property);
             }
@@ -62,18 +62,6 @@ const CMPIInstance* listed(const Request& request, const ServedClass& served,
 }
 
 }  // namespace
-
-bool lists(const char** properties, const char* name) noexcept {
-    if (properties == nullptr) {
-        return true;
-    }
-    for (const char** each = properties; *each != nullptr; ++each) {
-        if (equalNames(*each, name)) {
-            return true;
-        }
-    }
-    return false;
-}
 
 const CMPIInstance* completed(const Request& request, const ServedClass& served,
                               const CMPIInstance* instance, const char** properties) {

@@ -7,10 +7,6 @@
 
 namespace ZR::DHCPClientGateway {
 
-/// Whether a property list, null for all properties, has a property. Names compare without
-/// regard to case.
-[[nodiscard]] bool lists(const char** properties, const char* name) noexcept;
-
 /// The instance as a client with this property list gets it: without what the list leaves
 /// out, with a null for each listed property that is not known, and without a list for
 /// those of them of which some object managers would show the default of the schema: a null

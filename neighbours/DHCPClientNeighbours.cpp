@@ -89,19 +89,6 @@ struct PropertySetter {
     }
 };
 
-/// Whether a property list, null for all properties, has a property.
-bool lists(const char** properties, const std::string& name) {
-    if (properties == nullptr) {
-        return true;
-    }
-    for (const char** each = properties; *each != nullptr; ++each) {
-        if (equalNames(*each, name)) {
-            return true;
-        }
-    }
-    return false;
-}
-
 /// Sets one property to the null of its type.
 struct NullSetter {
     CMPIInstance* instance;
@@ -127,12 +114,12 @@ CMPIInstance* makeInstance(const NeighbourObject& object, const std::string& nam
     CMPIInstance* instance = ProviderUtilities::createInstance(broker, makePath(object, nameSpace));
     bool complete = instance != nullptr;
     for (const auto& [name, value] : object.keys) {
-        if (lists(properties, name)) {
+        if (ProviderUtilities::isListed(properties, name)) {
             complete = complete && PropertySetter{instance, name.c_str()}(value);
         }
     }
     for (const auto& [name, value] : object.properties) {
-        complete = complete && (lists(properties, name)
+        complete = complete && (ProviderUtilities::isListed(properties, name)
                                     ? std::visit(PropertySetter{instance, name.c_str()}, value)
                                     : std::visit(NullSetter{instance, name.c_str()}, value));
     }

@@ -11,26 +11,6 @@ namespace conformance {
 
 namespace {
 
-const char* nameOf(Operation operation) {
-    switch (operation) {
-        case Operation::enumerateNames:
-            return "names of ";
-        case Operation::enumerate:
-            return "instances of ";
-        case Operation::get:
-            return "get ";
-        case Operation::associatorNames:
-            return "associator names of ";
-        case Operation::associators:
-            return "associators of ";
-        case Operation::referenceNames:
-            return "reference names of ";
-        case Operation::references:
-            return "references of ";
-    }
-    return "";
-}
-
 std::string lowered(std::string text) {
     std::transform(text.begin(), text.end(), text.begin(), cimom::lowered);
     return text;

@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "cimom/Instance.h"
+#include "kit/ReadOperation.h"
 
 /// One description of what clients ask and of what they are to get, for every object
 /// manager that the providers can be in.
@@ -15,15 +16,7 @@ namespace conformance {
 using Texts = std::vector<std::string>;
 using Name = std::optional<std::string>;
 
-enum class Operation {
-    enumerateNames,
-    enumerate,
-    get,
-    associatorNames,
-    associators,
-    referenceNames,
-    references
-};
+using Operation = test::ReadOperation;
 
 inline constexpr const char* nameSpace = "root/cimv2";
 

@@ -119,26 +119,6 @@ StrictHost::Response ofSource(const cimom::ObjectPath& source, StrictHost::Respo
     return response;
 }
 
-const char* nameOf(Operation operation) {
-    switch (operation) {
-        case Operation::enumerateNames:
-            return "names of ";
-        case Operation::enumerate:
-            return "instances of ";
-        case Operation::get:
-            return "get ";
-        case Operation::associatorNames:
-            return "associator names of ";
-        case Operation::associators:
-            return "associators of ";
-        case Operation::referenceNames:
-            return "reference names of ";
-        case Operation::references:
-            return "references of ";
-    }
-    return "";
-}
-
 }  // namespace
 
 std::string HostRequest::name() const {

@@ -4,6 +4,7 @@
 #include <vector>
 
 #include "cimom/ObjectManager.h"
+#include "kit/ReadOperation.h"
 #include "kit/StrictHost.h"
 
 /// Requests that are put to the embedded object manager and to the strict host alike,
@@ -12,15 +13,7 @@ namespace strict {
 
 using Texts = std::vector<std::string>;
 
-enum class Operation {
-    enumerateNames,
-    enumerate,
-    get,
-    associatorNames,
-    associators,
-    referenceNames,
-    references
-};
+using Operation = test::ReadOperation;
 
 struct HostRequest {
     Operation operation;

@@ -197,6 +197,18 @@ CMPIInstance* ProviderUtilities::createInstance(const CMPIBroker* broker,
     return isOk(status) ? instance : nullptr;
 }
 
+bool ProviderUtilities::isListed(const char* const* properties, std::string_view name) noexcept {
+    if (properties == nullptr) {
+        return true;
+    }
+    for (; *properties != nullptr; ++properties) {
+        if (equalNames(*properties, name)) {
+            return true;
+        }
+    }
+    return false;
+}
+
 unsigned int ProviderUtilities::getKeyCount(const CMPIObjectPath* path) {
     const CMPICount declared = path == nullptr ? 0 : path->ft->getKeyCount(path, nullptr);
     unsigned int count = 0;

@@ -1,5 +1,6 @@
 #include <gtest/gtest.h>
 
+#include <array>
 #include <string>
 #include <vector>
 
@@ -225,6 +226,20 @@ TEST_F(PropertiesTest, BrokerThatMakesNothingSetsNothing) {
     for (const char* name : {"ElementName", "Numbers", "Texts"}) {
         EXPECT_FALSE(has(name)) << name;
     }
+}
+
+TEST(PropertyLists, NameWhatAClientWantsInAnyCase) {
+    const std::array<const char*, 3> list{"Name", "elementNAME", nullptr};
+    EXPECT_TRUE(ProviderUtilities::isListed(list.data(), "Name"));
+    EXPECT_TRUE(ProviderUtilities::isListed(list.data(), "ElementName"));
+    EXPECT_FALSE(ProviderUtilities::isListed(list.data(), "Element"));
+    EXPECT_FALSE(ProviderUtilities::isListed(list.data(), ""));
+}
+
+TEST(PropertyLists, WithoutOneAllIsWantedAndWithAnEmptyOneNothing) {
+    EXPECT_TRUE(ProviderUtilities::isListed(nullptr, "Name"));
+    const std::array<const char*, 1> none{nullptr};
+    EXPECT_FALSE(ProviderUtilities::isListed(none.data(), "Name"));
 }
 
 }  // namespace

@@ -3,6 +3,7 @@
 #include <cmpift.h>
 
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "zrclient/Moniker.h"
@@ -41,6 +42,11 @@ struct ProviderUtilities {
                                                           const std::string& nameSpace);
     [[nodiscard]] static CMPIInstance* createInstance(const CMPIBroker* broker,
                                                       const CMPIObjectPath* path);
+
+    /// Whether a property list of a request, null for all properties, has a property. Names
+    /// compare without regard to case.
+    [[nodiscard]] static bool isListed(const char* const* properties,
+                                       std::string_view name) noexcept;
 
     // Keys. Only those with a value count, whatever the host counts, and a path is never
     // asked for one by name. A key is read as text only when it is one, as a reference
