@@ -1,5 +1,6 @@
 #include "LeaseRules.h"
 
+#include <cstdlib>
 #include <optional>
 
 namespace ZR::Live {
@@ -7,6 +8,8 @@ namespace {
 
 // A client sets the address some moments before or after it writes the file.
 constexpr std::int64_t tolerance = 10;  // seconds
+
+constexpr std::int64_t sameMoment = 2;  // seconds, as both are counted in whole ones
 
 constexpr std::int64_t endlessSpan = std::int64_t{100} * 365 * 24 * 3600;  // seconds
 
@@ -94,6 +97,10 @@ Standing settle(Lease& lease, const Address& address, std::int64_t now) noexcept
         return Standing::Foreign;
     }
     if (isNear(*lease.expires - end)) {
+        // A client that was given the lease again may not have written that down.
+        if (lease.clientAlive && std::abs(*lease.expires - end) > sameMoment) {
+            move(lease, end - *lease.expires);
+        }
         return standingBy(lease, now);
     }
     if (!lease.clientAlive && *lease.expires < end) {

@@ -26,8 +26,9 @@ enum class Standing : std::uint8_t {
 ///
 /// The kernel counts an address's remaining lifetime by itself, so it is right where the
 /// clock was set since the client wrote its file: the times of the lease are moved so that
-/// its end is the kernel's. That of a client that is gone is never moved to a later time. A
-/// lease without a known end takes that of the address.
+/// its end is the kernel's, and likewise where the client was given the lease again since. That
+/// of a client that is gone is never moved to a later time. A lease without a known end takes
+/// that of the address.
 [[nodiscard]] Standing settle(Lease& lease, const Address& address, std::int64_t now) noexcept;
 
 /// Whether an address ends when a lease does, so that it is probably the lease's even if the

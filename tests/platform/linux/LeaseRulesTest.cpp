@@ -80,9 +80,17 @@ TEST(LeaseRules, AfterTheClockWasSetAllTimesMoveToTheKernels) {
     }
     Lease over = leaseOf(Client::Dhclient, now + year);
     EXPECT_EQ(settle(over, addressFor(0), now), Standing::Ended) << "the kernel is taking it away";
-    Lease near = leaseOf(Client::Dhclient, now + 310);
+    Lease near = leaseOf(Client::Dhclient, now + 302);
     EXPECT_EQ(settle(near, addressFor(300), now), Standing::Live);
-    EXPECT_EQ(near.expires, now + 310) << "the client's own word is the finer one";
+    EXPECT_EQ(near.expires, now + 302) << "the client's own word is the finer one";
+    Lease again = leaseOf(Client::Dhclient, now + 290);
+    again.clientAlive = true;
+    EXPECT_EQ(settle(again, addressFor(300), now), Standing::Live);
+    EXPECT_EQ(again.expires, now + 300) << "the client was given it again";
+    Lease dead = leaseOf(Client::Dhclient, now + 290);
+    dead.clientAlive = false;
+    EXPECT_EQ(settle(dead, addressFor(300), now), Standing::Live);
+    EXPECT_EQ(dead.expires, now + 290) << "it does not last longer";
 }
 
 TEST(LeaseRules, AnOldLeaseOfAClientThatIsGoneIsNotThatOfANewAddress) {
