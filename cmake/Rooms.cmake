@@ -76,14 +76,10 @@ function(zr_precompiled target)
     target_precompile_headers(${target} REUSE_FROM room_headers)
 endfunction()
 
-# zr_compiled_together(TARGET [EXCEPT file|folder/...]): with ZR_COMPILED_TOGETHER, as for
-# scripts/run and the sanitizers, the sources of each folder of the target are compiled as
-# one, but for those whose own names another one of the folder has, too: headers are then
-# read, and what is instantiated of templates is made, once.
-function(zr_compiled_together target)
-    if(NOT ZR_COMPILED_TOGETHER)
-        return()
-    endif()
+# zr_compiled_as_one(TARGET [EXCEPT file|folder/...]): the sources of each folder of the
+# target are compiled as one, but for those whose own names another one of the folder has,
+# too: headers are then read, and what is instantiated of templates is made, once.
+function(zr_compiled_as_one target)
     cmake_parse_arguments(TOGETHER "" "" "EXCEPT" ${ARGN})
     set_target_properties(${target} PROPERTIES UNITY_BUILD ON UNITY_BUILD_MODE GROUP)
     get_target_property(sources ${target} SOURCES)
@@ -96,6 +92,14 @@ function(zr_compiled_together target)
             set_source_files_properties(${source} PROPERTIES UNITY_GROUP ${group})
         endif()
     endforeach()
+endfunction()
+
+# zr_compiled_together(TARGET [EXCEPT file|folder/...]): the same for a library of the
+# product, with ZR_COMPILED_TOGETHER, as for scripts/run and the sanitizers.
+function(zr_compiled_together target)
+    if(ZR_COMPILED_TOGETHER)
+        zr_compiled_as_one(${target} ${ARGN})
+    endif()
 endfunction()
 
 # zr_room(NAME SOURCES file... [ROOT directory] [LINKS target...] [PRIVATE_LINKS target...]
@@ -178,6 +182,9 @@ function(zr_test name)
                           GTest::gtest_main)
     target_compile_definitions(${name} PRIVATE ZR_SOURCE_DIR="${PROJECT_SOURCE_DIR}"
                                ZR_BINARY_DIR="${PROJECT_BINARY_DIR}")
+    if(ZR_TESTS_COMPILED_TOGETHER)
+        zr_compiled_as_one(${name})
+    endif()
     if(TEST_ONE_THREAD AND ZR_SANITIZERS MATCHES thread)
         set_target_properties(${name} PROPERTIES EXCLUDE_FROM_ALL ON)
         return()

@@ -50,6 +50,8 @@ def included_files(source, build, commands):
 
     def find(name, directories):
         paths = (os.path.normpath(os.path.join(directory, name)) for directory in directories)
+        # What compiles a folder as one names its sources absolutely.
+        paths = (inside(path) or path for path in paths)
         return next((path for path in paths if os.path.isfile(os.path.join(source, path))), None)
 
     for command in commands:

@@ -7,19 +7,19 @@
 
 #include "text/Failure.h"
 
-namespace cimdhcp::test {
+namespace test {
 
 /// The message of the Failure that a call ends with, which has the status given;
 /// "accepted" for a call that ends without one.
 template <typename Call>
-std::string refusalOf(Call&& call, ExitStatus status) {
+std::string refusalOf(Call&& call, cimdhcp::ExitStatus status) {
     try {
         static_cast<void>(std::forward<Call>(call)());
         return "accepted";
-    } catch (const Failure& failure) {
+    } catch (const cimdhcp::Failure& failure) {
         EXPECT_EQ(failure.status(), status);
         return failure.what();
     }
 }
 
-}  // namespace cimdhcp::test
+}  // namespace test

@@ -17,7 +17,7 @@ using ZR::Testing::TemporaryDirectory;
 using ZR::Testing::writeFile;
 
 template <typename Find>
-std::string refusal(Find&& find) {
+std::string searchRefusal(Find&& find) {
     return test::refusalOf(std::forward<Find>(find), ExitStatus::notLoaded);
 }
 
@@ -59,7 +59,7 @@ TEST_F(DirectoriesFound, MoveWithTheOptions) {
 
 TEST_F(DirectoriesFound, NameThePlacesWhereTheyWereNot) {
     EXPECT_EQ(
-        refusal([] {
+        searchRefusal([] {
             return findDirectories({}, {{"/a/b", "", {}}, {"/c", "", {}}});
         }),
         "no schema found in /a/b, /c; --schema-dir and --provider-dir can name where they are");
@@ -70,7 +70,7 @@ TEST_F(DirectoriesFound, MustExistWhenNamed) {
     Options options;
     options.directories.providerDirs = {place.schema, root_ / "missing"};
     EXPECT_EQ(
-        refusal([&] { return findDirectories(options, {place}); }),
+        searchRefusal([&] { return findDirectories(options, {place}); }),
         root_ / "missing" + ": no such directory (from --provider-dir or CIMDHCP_PROVIDER_DIR)");
 }
 

@@ -13,7 +13,7 @@ CommandLine line(const std::vector<std::string>& arguments) {
     return std::get<CommandLine>(readCommandLine(arguments));
 }
 
-std::string refusal(const std::vector<std::string>& arguments) {
+std::string lineRefusal(const std::vector<std::string>& arguments) {
     return test::refusalOf([&arguments] { return readCommandLine(arguments); }, ExitStatus::usage);
 }
 
@@ -60,31 +60,31 @@ TEST(OptionRules, RefusesWhatServersCannotBeAsked) {
          {std::vector<std::string>{"tree"}, {"serve"}, {"user", "add", "--users", "f", "a"}}) {
         std::vector<std::string> arguments{"--connect", "h"};
         arguments.insert(arguments.end(), command.begin(), command.end());
-        EXPECT_EQ(refusal(arguments),
+        EXPECT_EQ(lineRefusal(arguments),
                   "this command is about this machine alone; --connect and --hosts are not for it");
     }
     EXPECT_EQ(line({"--connect", "h", "check"}).command, Command(CheckCommand{}));
-    EXPECT_EQ(refusal({"--connect", "h", "rename", "--create", "eth0", "x"}),
+    EXPECT_EQ(lineRefusal({"--connect", "h", "rename", "--create", "eth0", "x"}),
               "--create cannot make files on other machines");
-    EXPECT_EQ(refusal({"--hosts", "f", "--tree", "t", "show"}),
+    EXPECT_EQ(lineRefusal({"--hosts", "f", "--tree", "t", "show"}),
               "--tree and --data-dir are about this machine; they cannot be given with --connect "
               "or --hosts");
     for (const char* option : {"--credentials=c", "--cacert=c", "--insecure"}) {
-        EXPECT_NE(refusal({option, "show"}), "accepted");
+        EXPECT_NE(lineRefusal({option, "show"}), "accepted");
     }
     for (const char* option : {"--parallel=0", "--parallel=257", "--timeout=0", "--timeout=-1",
                                "--timeout=x", "--timeout=86401", "--color=red"}) {
-        EXPECT_NE(refusal({"--connect", "h", option, "show"}), "accepted") << option;
+        EXPECT_NE(lineRefusal({"--connect", "h", option, "show"}), "accepted") << option;
     }
 }
 
 TEST(OptionRules, RefusesToSortAndCountWhatIsNoList) {
-    EXPECT_EQ(refusal({"graph", "--count"}),
+    EXPECT_EQ(lineRefusal({"graph", "--count"}),
               "the result of this command is not a list: there is nothing to count");
-    EXPECT_EQ(refusal({"rename", "a", "b", "--sort", "x"}),
+    EXPECT_EQ(lineRefusal({"rename", "a", "b", "--sort", "x"}),
               "the result of this command is not a list: there is nothing to sort");
-    EXPECT_NE(refusal({"get", "P", "--count"}), "accepted");
-    EXPECT_NE(refusal({"serve", "--count"}), "accepted");
+    EXPECT_NE(lineRefusal({"get", "P", "--count"}), "accepted");
+    EXPECT_NE(lineRefusal({"serve", "--count"}), "accepted");
 }
 
 }  // namespace

@@ -10,7 +10,7 @@ namespace cimdhcp {
 namespace {
 
 template <typename Read>
-std::string refusal(Read&& read) {
+std::string readingOf(Read&& read) {
     try {
         return "read as " + cimom::toText(std::forward<Read>(read)());
     } catch (const Failure& failure) {
@@ -35,7 +35,7 @@ TEST_F(PathArgument, HasTheDefaultNamespaceWhenItNamesNone) {
 }
 
 TEST_F(PathArgument, NeedsAKeyWhenItsClassHasKeys) {
-    EXPECT_EQ(refusal([&] { return read("TEST_Base"); }),
+    EXPECT_EQ(readingOf([&] { return read("TEST_Base"); }),
               "\"TEST_Base\" names a class, not an instance: its keys are missing; list the paths "
               "with: cimdhcp names TEST_Base");
     EXPECT_EQ(cimom::toText(read("TEST_Keyless")), "root/cimv2:TEST_Keyless");
@@ -44,7 +44,7 @@ TEST_F(PathArgument, NeedsAKeyWhenItsClassHasKeys) {
 }
 
 TEST_F(PathArgument, RemindsOfTheShellWhenTheQuotesAreGone) {
-    const std::string text = refusal([&] { return read("TEST_Base.Id=a"); });
+    const std::string text = readingOf([&] { return read("TEST_Base.Id=a"); });
     EXPECT_EQ(text.substr(0, 31), "cannot read \"TEST_Base.Id=a\": o") << text;
     EXPECT_NE(text.find("write it in single quotes"), std::string::npos) << text;
 }
@@ -55,12 +55,12 @@ TEST(ClassArgument, MayHaveANamespace) {
 }
 
 TEST(ClassArgument, IsNoInstance) {
-    EXPECT_EQ(refusal([] { return readClassArgument("TEST_Base.Id=\"a\"", "root/cimv2"); }),
+    EXPECT_EQ(readingOf([] { return readClassArgument("TEST_Base.Id=\"a\"", "root/cimv2"); }),
               "\"TEST_Base.Id=\"a\"\" is the path of an instance; give its class alone: TEST_Base");
 }
 
 TEST(ClassArgument, IsNotEmpty) {
-    EXPECT_EQ(refusal([] { return readClassArgument("", "root/cimv2"); }),
+    EXPECT_EQ(readingOf([] { return readClassArgument("", "root/cimv2"); }),
               "cannot read \"\": object path, column 1: a class name was expected");
 }
 

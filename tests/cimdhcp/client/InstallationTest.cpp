@@ -17,7 +17,7 @@ using ZR::Testing::TemporaryDirectory;
 using ZR::Testing::writeFile;
 
 template <typename Find>
-std::string refusal(Find&& find) {
+std::string installationRefusal(Find&& find) {
     return test::refusalOf(std::forward<Find>(find), ExitStatus::notLoaded);
 }
 
@@ -42,9 +42,9 @@ TEST(RegistrationFiles, AreSortedByName) {
 
 TEST(RegistrationFiles, MustBeThere) {
     const TemporaryDirectory directory;
-    EXPECT_EQ(refusal([&] { return registrationFiles(directory.path()); }),
+    EXPECT_EQ(installationRefusal([&] { return registrationFiles(directory.path()); }),
               directory.path().string() + ": no *.registration file is in it");
-    EXPECT_EQ(refusal([&] { return registrationFiles(directory / "missing"); }),
+    EXPECT_EQ(installationRefusal([&] { return registrationFiles(directory / "missing"); }),
               directory / "missing" + ": No such file or directory");
 }
 
@@ -63,7 +63,7 @@ TEST(CimSchemaFile, MustBeOne) {
     const TemporaryDirectory directory;
     const std::string from = " (from --cim-schema or CIMDHCP_CIM_SCHEMA)";
     const auto refused = [&](const std::string& place) {
-        return refusal([&] { return cimSchemaFile(place); });
+        return installationRefusal([&] { return cimSchemaFile(place); });
     };
     EXPECT_EQ(refused(directory / "missing"),
               directory / "missing" + ": no such file or directory" + from);

@@ -5,7 +5,7 @@
 namespace cimdhcp {
 namespace {
 
-constexpr std::int64_t now = 1'795'320'000;  // 2026-11-22T04:00:00Z
+constexpr std::int64_t moment = 1'795'320'000;  // 2026-11-22T04:00:00Z
 
 LeaseOverview leaseOf(const std::string& client, const std::string& address, std::int64_t expires) {
     LeaseOverview lease;
@@ -32,7 +32,7 @@ InterfaceOverview interface(const std::string& name, bool dhcp, const std::strin
 
 InterfaceOverview bound() {
     InterfaceOverview bound = interface("eth0", true, "192.0.2.17");
-    bound.leases = {leaseOf("dhclient", "192.0.2.17", now + 4 * 3600)};
+    bound.leases = {leaseOf("dhclient", "192.0.2.17", moment + 4 * 3600)};
     bound.servers = {"192.0.2.1", "2001:db8::1"};
     bound.configurationName = "office";
     return bound;
@@ -68,11 +68,11 @@ InterfaceOverview ofProcessor() {
 }
 
 std::string rowOf(const InterfaceOverview& interface) {
-    return overviewTable({interface}, now, std::nullopt, {false, false});
+    return overviewTable({interface}, moment, std::nullopt, {false, false});
 }
 
 TEST(Overview, IsATable) {
-    EXPECT_EQ(overviewTable({bound(), fixed(), asking(), untold()}, now, std::nullopt),
+    EXPECT_EQ(overviewTable({bound(), fixed(), asking(), untold()}, moment, std::nullopt),
               "INTERFACE  DHCP  STATE   CLIENT    ADDRESS       EXPIRES  SERVERS                 "
               "CONFIGURATION NAME\n"
               "eth0       on    bound   dhclient  192.0.2.17    in 4 h   192.0.2.1, 2001:db8::1  "
@@ -86,7 +86,7 @@ TEST(Overview, IsATable) {
 }
 
 TEST(Overview, HasTheSystemWhereThereAreTwo) {
-    EXPECT_EQ(overviewTable({fixed(), ofProcessor()}, now, std::nullopt),
+    EXPECT_EQ(overviewTable({fixed(), ofProcessor()}, moment, std::nullopt),
               "SYSTEM    INTERFACE  DHCP  STATE  CLIENT  ADDRESS       EXPIRES  SERVERS  "
               "CONFIGURATION NAME\n"
               "Computer  eth1       off   off    -       198.51.100.4  -        -        -\n"
@@ -94,32 +94,34 @@ TEST(Overview, HasTheSystemWhereThereAreTwo) {
 }
 
 TEST(Overview, SaysThatNoInterfaceUsesDhcp) {
-    const std::string text = overviewTable({fixed()}, now, std::nullopt);
+    const std::string text = overviewTable({fixed()}, moment, std::nullopt);
     EXPECT_EQ(text.substr(text.find('\n', text.find("eth1")) + 1),
               "No interface of this machine uses DHCP.\n");
     // It would be a guess when it is not known.
-    EXPECT_EQ(overviewTable({untold()}, now, std::nullopt).find("No interface"), std::string::npos);
+    EXPECT_EQ(overviewTable({untold()}, moment, std::nullopt).find("No interface"),
+              std::string::npos);
 }
 
 TEST(Overview, SaysThatThereAreNoInterfaces) {
-    EXPECT_EQ(overviewTable({}, now, std::nullopt), "This machine has no network interfaces.\n");
+    EXPECT_EQ(overviewTable({}, moment, std::nullopt), "This machine has no network interfaces.\n");
 }
 
 TEST(Overview, FitsATerminal) {
-    EXPECT_EQ(overviewTable({bound()}, now, 80),
+    EXPECT_EQ(overviewTable({bound()}, moment, 80),
               "INTERFACE  DHCP  STATE  CLIENT    ADDRESS     EXPIRES  SERVERS      CONFIGURATI…\n"
               "eth0       on    bound  dhclient  192.0.2.17  in 4 h   192.0.2.1,…  office\n");
 }
 
 TEST(Overview, HeadingsAreStrongWhereThereAreColors) {
-    EXPECT_EQ(overviewTable({fixed()}, now, std::nullopt, {true, true}).substr(0, 13),
+    EXPECT_EQ(overviewTable({fixed()}, moment, std::nullopt, {true, true}).substr(0, 13),
               "\x1B[1mINTERFACE");
-    EXPECT_EQ(overviewTable({fixed()}, now, std::nullopt, {true, false}).substr(0, 9), "INTERFACE");
+    EXPECT_EQ(overviewTable({fixed()}, moment, std::nullopt, {true, false}).substr(0, 9),
+              "INTERFACE");
 }
 
 TEST(Overview, WithoutHeadingsIsRowsAlone) {
     const Style bare{false, false};
-    EXPECT_EQ(overviewTable({}, now, std::nullopt, bare), "");
+    EXPECT_EQ(overviewTable({}, moment, std::nullopt, bare), "");
     EXPECT_EQ(rowOf(interface("eth0", false, "")), "eth0  off  off  -  -  -  -  -\n");
 }
 
@@ -129,7 +131,7 @@ TEST(Overview, TellsWhenALeaseEnds) {
     lease.expires = static_cast<std::int64_t>(ZR::NodeLexicon::never);
     EXPECT_EQ(rowOf(one),
               "eth0  on  bound  dhclient  192.0.2.17  never  192.0.2.1, 2001:db8::1  office\n");
-    lease.expires = now - 7200;
+    lease.expires = moment - 7200;
     EXPECT_EQ(rowOf(one),
               "eth0  on  expired  dhclient  192.0.2.17  2 h ago  192.0.2.1, 2001:db8::1  office\n");
     lease.expires = std::nullopt;
@@ -156,15 +158,15 @@ TEST(Overview, ShowsTheLeaseThatThereIsWithoutALink) {
 
 TEST(Overview, HasTheAddressOfIPv6WhereThereIsNoneOfIPv4) {
     InterfaceOverview one = asking();
-    one.leases->push_back(leaseOf("dhcp6c", "2001:db8::17", now + 600));
+    one.leases->push_back(leaseOf("dhcp6c", "2001:db8::17", moment + 600));
     EXPECT_EQ(rowOf(one), "eth2  on  bound  dhcp6c  2001:db8::17  in 10 min  -  -\n");
-    one.leases->back().expires = now;
+    one.leases->back().expires = moment;
     EXPECT_EQ(rowOf(one), "eth2  on  expired  dhcp6c  -  in 0 s  -  -\n");
 }
 
 TEST(Overview, TellsOfTwoFamiliesThatOfIPv4) {
     InterfaceOverview one = bound();
-    one.leases->insert(one.leases->begin(), leaseOf("dhcp6c", "2001:db8::17", now + 600));
+    one.leases->insert(one.leases->begin(), leaseOf("dhcp6c", "2001:db8::17", moment + 600));
     EXPECT_EQ(rowOf(one), rowOf(bound()));
 }
 
@@ -178,8 +180,8 @@ TEST(Overview, OfALeaseWithoutAClientsNameTheClientIsNotKnown) {
 TEST(Overview, IsSortedByWhenLeasesEnd) {
     std::vector<InterfaceOverview> rows{untold(), bound(), fixed(), bound()};
     rows[3].name = "eth4";
-    rows[3].leases->front().expires = now + 1800;  // "in 30 min", and so before "in 4 h"
-    sortBy("expires", overviewColumns(now), rows);
+    rows[3].leases->front().expires = moment + 1800;  // "in 30 min", and so before "in 4 h"
+    sortBy("expires", overviewColumns(moment), rows);
     std::string order;
     for (const InterfaceOverview& each : rows) {
         order += each.name + ' ';
@@ -191,14 +193,14 @@ TEST(Overview, IsJson) {
     InterfaceOverview one = bound();
     LeaseOverview& lease = one.leases->front();
     lease.server = "192.0.2.1";
-    lease.obtained = now;
-    lease.renews = now + 7200;
-    lease.rebinds = now + 12600;
+    lease.obtained = moment;
+    lease.renews = moment + 7200;
+    lease.rebinds = moment + 12600;
     lease.options = {1, 3, 6};
     lease.clientIdentifier = "01:02";
     lease.process = 17;
     lease.source = "/var/lib/dhcp/dhclient.leases";
-    EXPECT_EQ(overviewJson({one, asking(), untold()}, now), R"({
+    EXPECT_EQ(overviewJson({one, asking(), untold()}, moment), R"({
   "interfaces": [
     {
       "interface": "eth0",
@@ -314,7 +316,7 @@ TEST(Overview, IsJson) {
 }
 
 TEST(UnknownText, IsEmptyWhereAllIsKnown) {
-    EXPECT_EQ(unknownText({bound(), fixed(), asking()}, now), "");
+    EXPECT_EQ(unknownText({bound(), fixed(), asking()}, moment), "");
 }
 
 TEST(UnknownText, GathersLikeInterfaces) {
@@ -324,7 +326,7 @@ TEST(UnknownText, GathersLikeInterfaces) {
     other.name = "eth6";
     InterfaceOverview endless = bound();
     endless.leases->front().expires = std::nullopt;
-    EXPECT_EQ(unknownText({hidden, endless, other, ofProcessor()}, now),
+    EXPECT_EQ(unknownText({hidden, endless, other, ofProcessor()}, moment),
               "cimdhcp: note: eth5, eth6: nothing tells DHCP, STATE, CLIENT and EXPIRES\n"
               "cimdhcp: note: eth0: nothing tells EXPIRES\n"
               "cimdhcp: note: eth0 of BMC: nothing tells CLIENT and EXPIRES\n");
@@ -341,11 +343,11 @@ TEST(UnknownText, IsOneLineForAnotherMachine) {
     disabled.clientState = 0;
     InterfaceOverview off = on;
     off.dhcp = false;
-    EXPECT_EQ(unknownText({on, off}, now),
+    EXPECT_EQ(unknownText({on, off}, moment),
               "cimdhcp: note: the server does not tell CLIENT and EXPIRES\n");
-    EXPECT_EQ(unknownText({on, disabled}, now),
+    EXPECT_EQ(unknownText({on, disabled}, moment),
               "cimdhcp: note: the server does not tell STATE, CLIENT and EXPIRES\n");
-    EXPECT_EQ(unknownText({off}, now), "");
+    EXPECT_EQ(unknownText({off}, moment), "");
 }
 
 }  // namespace

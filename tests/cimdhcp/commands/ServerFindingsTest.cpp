@@ -165,7 +165,7 @@ class Manager : public Client {
 };
 
 /// The findings that are not good.
-std::vector<Finding> wrong(Manager& manager) {
+std::vector<Finding> wrongFindings(Manager& manager) {
     std::vector<Finding> findings = serverFindings(manager);
     std::erase_if(findings,
                   [](const Finding& each) { return each.verdict == Finding::Verdict::good; });
@@ -192,7 +192,7 @@ TEST(ServerFindings, TellOfClassesThatFailAlikeAtOnce) {
         {"QVXZR_DHCPProtocolEndpoint", notLoaded},
         {"QVXZR_DHCPCapabilities", notLoaded},
         {"QVXZR_DHCPSettingData", {CMPI_RC_ERR_NOT_SUPPORTED, "CIM_ERR_NOT_SUPPORTED: blocked"}}};
-    const std::vector<Finding> findings = wrong(manager);
+    const std::vector<Finding> findings = wrongFindings(manager);
     EXPECT_THAT(findings, Contains(finding("QVXZR_DHCPProtocolEndpoint, QVXZR_DHCPCapabilities",
                                            "CIM_ERR_NOT_FOUND: Provider not loadable",
                                            "the library is not in a directory")));
@@ -204,7 +204,7 @@ TEST(ServerFindings, TellWhatAStatusComesFrom) {
     const auto remedyFor = [](CMPIrc code) {
         Manager manager;
         manager.failures = {{"QVXZR_DHCPSettingData", {code, ""}}};
-        return wrong(manager).at(0).remedy;
+        return wrongFindings(manager).at(0).remedy;
     };
     EXPECT_THAT(remedyFor(CMPI_RC_ERR_ACCESS_DENIED), HasSubstr("--credentials"));
     EXPECT_THAT(remedyFor(CMPI_RC_ERR_INVALID_NAMESPACE), HasSubstr("--namespace"));
@@ -216,7 +216,7 @@ TEST(ServerFindings, TellWhatAStatusComesFrom) {
 TEST(ServerFindings, TellThatNoClassHasAProvider) {
     Manager manager;
     manager.instances.clear();
-    EXPECT_THAT(wrong(manager),
+    EXPECT_THAT(wrongFindings(manager),
                 ElementsAre(finding(
                     "classes", "are known, and none has an instance, not even QVXZR_ComputerSystem",
                     "no provider is registered")));
@@ -226,7 +226,7 @@ TEST(ServerFindings, TellThatNeighboursAreMissing) {
     Manager manager;
     manager.instances.erase("QVXZR_ComputerSystem");
     manager.instances.erase("QVXZR_IPProtocolEndpoint");
-    const std::vector<Finding> findings = wrong(manager);
+    const std::vector<Finding> findings = wrongFindings(manager);
     EXPECT_THAT(findings,
                 Contains(finding("QVXZR_ComputerSystem", "no instance, and every machine has one",
                                  "register the neighbours")));
@@ -240,7 +240,7 @@ TEST(ServerFindings, TellThatNeighboursAreMissing) {
 TEST(ServerFindings, AClassWithoutInstancesIsWorthALook) {
     Manager manager;
     manager.instances.erase("QVXZR_DHCPCapabilities");
-    EXPECT_THAT(wrong(manager),
+    EXPECT_THAT(wrongFindings(manager),
                 ElementsAre(AllOf(Field(&Finding::verdict, Finding::Verdict::notable),
                                   Field(&Finding::what, "QVXZR_DHCPCapabilities"),
                                   Field(&Finding::detail, "no instance"))));
@@ -249,7 +249,7 @@ TEST(ServerFindings, AClassWithoutInstancesIsWorthALook) {
 TEST(ServerFindings, TellThatAnotherInstanceIsGiven) {
     Manager manager;
     manager.alwaysTheFirst = {"QVXZR_DHCPRemoteServiceAccessPoint"};
-    EXPECT_THAT(wrong(manager),
+    EXPECT_THAT(wrongFindings(manager),
                 ElementsAre(finding("QVXZR_DHCPRemoteServiceAccessPoint",
                                     "GetInstance of QVXZR_DHCPRemoteServiceAccessPoint."
                                     "InstanceID=\"2\" gives another instance (and 1 response "
@@ -261,7 +261,7 @@ TEST(ServerFindings, TellThatAnInstanceIsGivenWhichThereIsNot) {
     Manager manager;
     manager.alwaysTheFirst = {"QVXZR_DHCPSettingData"};
     manager.instances["QVXZR_DHCPSettingData"].pop_back();
-    EXPECT_THAT(wrong(manager),
+    EXPECT_THAT(wrongFindings(manager),
                 ElementsAre(finding("QVXZR_DHCPSettingData",
                                     "GetInstance of QVXZR_DHCPSettingData.InstanceID=\"1-none\", "
                                     "which there is not, gives an instance",
@@ -271,7 +271,7 @@ TEST(ServerFindings, TellThatAnInstanceIsGivenWhichThereIsNot) {
 TEST(ServerFindings, TellThatAnAssociationCannotBeGot) {
     Manager manager;
     manager.alwaysTheFirst = {"QVXZR_HostedDHCPPoint"};
-    const std::vector<Finding> findings = wrong(manager);
+    const std::vector<Finding> findings = wrongFindings(manager);
     ASSERT_THAT(findings, SizeIs(1));
     EXPECT_EQ(findings.at(0).what, "QVXZR_HostedDHCPPoint");
     EXPECT_THAT(findings.at(0).detail, HasSubstr("gives another instance"));
@@ -280,7 +280,7 @@ TEST(ServerFindings, TellThatAnAssociationCannotBeGot) {
 TEST(ServerFindings, TellOfReferencesToOtherInstances) {
     Manager manager;
     manager.unfiltered = true;
-    EXPECT_THAT(wrong(manager),
+    EXPECT_THAT(wrongFindings(manager),
                 Contains(finding("QVXZR_DHCPProtocolEndpoint",
                                  "7 of 14 references to QVXZR_DHCPProtocolEndpoint.InstanceID="
                                  "\"1\" do not name it (and 1 response like it)",
@@ -290,13 +290,13 @@ TEST(ServerFindings, TellOfReferencesToOtherInstances) {
 TEST(ServerFindings, TellThatReferencesFail) {
     Manager manager;
     manager.referencesStatus = {CMPI_RC_ERR_INVALID_CLASS, ""};
-    EXPECT_THAT(wrong(manager),
+    EXPECT_THAT(wrongFindings(manager),
                 Contains(finding("QVXZR_DHCPCapabilities",
                                  "ReferenceNames of QVXZR_DHCPCapabilities.InstanceID=\"1\": "
                                  "CIM_ERR_INVALID_CLASS (and 1 response like it)",
                                  "without --exact")));
     manager.referencesStatus = {CMPI_RC_ERR_FAILED, "libOther.so was not found"};
-    EXPECT_THAT(wrong(manager),
+    EXPECT_THAT(wrongFindings(manager),
                 Contains(finding("QVXZR_DHCPCapabilities",
                                  "ReferenceNames of QVXZR_DHCPCapabilities.InstanceID=\"1\": "
                                  "CIM_ERR_FAILED: libOther.so was not found (and 1 response like "
@@ -307,14 +307,14 @@ TEST(ServerFindings, TellThatReferencesFail) {
 TEST(ServerFindings, TellOfRequestsThatAreNotRespondedTo) {
     Manager manager;
     manager.silent = {"QVXZR_DHCPSettingData", "QVXZR_DHCPOrderedComponent"};
-    EXPECT_THAT(wrong(manager),
+    EXPECT_THAT(wrongFindings(manager),
                 ElementsAre(finding("QVXZR_DHCPSettingData, QVXZR_DHCPOrderedComponent",
                                     "no response", "manager's log")));
     manager.silent = {"QVXZR_DHCPProtocolEndpoint"};
     EXPECT_THROW(static_cast<void>(serverFindings(manager)), Failure);
     manager.silent.clear();
     manager.silentGet = "QVXZR_DHCPCapabilities";
-    EXPECT_THAT(wrong(manager),
+    EXPECT_THAT(wrongFindings(manager),
                 ElementsAre(finding("QVXZR_DHCPCapabilities", "no response", "manager's log")));
 }
 
@@ -329,7 +329,7 @@ TEST(ServerFindings, HostsAndNamespacesInReferencesDoNotCount) {
             each.properties.push_back({key.name, reference(end)});
         }
     }
-    EXPECT_THAT(wrong(manager), IsEmpty());
+    EXPECT_THAT(wrongFindings(manager), IsEmpty());
 }
 
 }  // namespace

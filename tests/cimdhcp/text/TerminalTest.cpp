@@ -22,9 +22,9 @@ class Terminal : public ::testing::Test {
         ASSERT_TRUE(terminal_);
     }
 
-    void setWidth(unsigned short columns) {
+    void setWidth(unsigned short width) {
         winsize size{};
-        size.ws_col = columns;
+        size.ws_col = width;
         size.ws_row = 24;
         ASSERT_EQ(::ioctl(terminal_.get(), TIOCSWINSZ, &size), 0);
     }

@@ -13,7 +13,7 @@ Value number(Type type, Scalar scalar) {
     return {type, false, std::move(scalar)};
 }
 
-Value reference(const std::string& text) {
+Value referenceValue(const std::string& text) {
     return {Type::reference, false,
             Scalar(std::make_shared<const ObjectPath>(parseObjectPath(text)))};
 }
@@ -50,9 +50,9 @@ TEST_F(PathMatch, NullAgreesWithNothing) {
 }
 
 TEST_F(PathMatch, ReferencesAgreeWithoutRegardToNamespaceLeftOutAndOrder) {
-    EXPECT_TRUE(sameKeyValue(reference("a:C.X=1,Y=2"), reference("c.y=2,x=1")));
-    EXPECT_FALSE(sameKeyValue(reference("a:C.X=1"), reference("b:C.X=1")));
-    EXPECT_FALSE(sameKeyValue(reference("C.X=1"), reference("C.X=1,Y=2")));
+    EXPECT_TRUE(sameKeyValue(referenceValue("a:C.X=1,Y=2"), referenceValue("c.y=2,x=1")));
+    EXPECT_FALSE(sameKeyValue(referenceValue("a:C.X=1"), referenceValue("b:C.X=1")));
+    EXPECT_FALSE(sameKeyValue(referenceValue("C.X=1"), referenceValue("C.X=1,Y=2")));
 }
 
 TEST_F(PathMatch, InstanceAgreesByPathOrProperty) {

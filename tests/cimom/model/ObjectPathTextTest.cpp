@@ -9,7 +9,7 @@
 namespace cimom {
 namespace {
 
-Value number(std::uint64_t content) {
+Value number64(std::uint64_t content) {
     return Value{Type::uint64, false, Scalar(content)};
 }
 
@@ -26,7 +26,7 @@ TEST(ObjectPathText, ReadsAFullPath) {
     EXPECT_EQ(path.className, "CIM_X");
     ASSERT_EQ(path.keys.size(), 2U);
     EXPECT_EQ(path.keys[0], (NamedValue{"InstanceID", Value::ofString("Computer%eth0")}));
-    EXPECT_EQ(path.keys[1], (NamedValue{"Number", number(17)}));
+    EXPECT_EQ(path.keys[1], (NamedValue{"Number", number64(17)}));
 }
 
 TEST(ObjectPathText, HostNamespaceAndKeysMayBeLeftOut) {
@@ -54,9 +54,9 @@ TEST(ObjectPathText, ReadsEveryKindOfValue) {
     EXPECT_EQ(onlyKey("\"a\\\"b\\\\c,d.e=f\""), Value::ofString("a\"b\\c,d.e=f"));
     EXPECT_EQ(onlyKey("TRUE"), (Value{Type::boolean, false, Scalar(true)}));
     EXPECT_EQ(onlyKey("false"), (Value{Type::boolean, false, Scalar(false)}));
-    EXPECT_EQ(onlyKey("-0"), number(0));
-    EXPECT_EQ(onlyKey("18446744073709551615"), number(std::numeric_limits<std::uint64_t>::max()));
-    EXPECT_EQ(onlyKey("+5"), number(5));
+    EXPECT_EQ(onlyKey("-0"), number64(0));
+    EXPECT_EQ(onlyKey("18446744073709551615"), number64(std::numeric_limits<std::uint64_t>::max()));
+    EXPECT_EQ(onlyKey("+5"), number64(5));
     EXPECT_EQ(onlyKey("-9223372036854775808"),
               (Value{Type::sint64, false, Scalar(std::numeric_limits<std::int64_t>::min())}));
     EXPECT_EQ(onlyKey("-1.5e3"), (Value{Type::real64, false, Scalar(-1500.0)}));
@@ -84,7 +84,7 @@ TEST(ObjectPathText, WritesNoHostAndNoLeadingSlash) {
 }
 
 TEST(ObjectPathText, WritesKeysInTheirOrderAndEscapesOnlyQuotesAndBackslashes) {
-    const ObjectPath path{"", "", "C", {{"Z", Value::ofString("a\"b\\c\nd")}, {"A", number(3)}}};
+    const ObjectPath path{"", "", "C", {{"Z", Value::ofString("a\"b\\c\nd")}, {"A", number64(3)}}};
     EXPECT_EQ(toText(path), "C.Z=\"a\\\"b\\\\c\nd\",A=3");
 }
 

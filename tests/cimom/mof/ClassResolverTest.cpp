@@ -8,7 +8,7 @@
 namespace cimom {
 namespace {
 
-constexpr const char* qualifierTypes = R"(
+constexpr const char* allQualifierTypes = R"(
 Qualifier Abstract : boolean = FALSE, Scope(class, association, indication), Flavor(Restricted);
 Qualifier Association : boolean = FALSE, Scope(association), Flavor(DisableOverride, ToSubclass);
 Qualifier Indication : boolean = FALSE, Scope(class, indication), Flavor(DisableOverride);
@@ -40,7 +40,7 @@ class T_Other { [Key] string Id; };
 class ClassResolver : public testing::Test {
   protected:
     ClassResolver() {
-        repository_.loadText(qualifierTypes, "qualifiers");
+        repository_.loadText(allQualifierTypes, "qualifiers");
         repository_.loadText(baseClasses, "base");
     }
 
@@ -135,7 +135,7 @@ class WrongClassText : public testing::TestWithParam<WrongClass> {};
 
 TEST_P(WrongClassText, IsRefusedWithThePlaceAndTheReason) {
     ClassRepository repository;
-    repository.loadText(qualifierTypes, "qualifiers");
+    repository.loadText(allQualifierTypes, "qualifiers");
     repository.loadText(baseClasses, "base");
     const auto before = repository.classes().size();
     try {

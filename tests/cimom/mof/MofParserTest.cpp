@@ -23,10 +23,6 @@ Kind only(std::string_view text) {
     return std::get<Kind>(all.at(0));
 }
 
-MofConstant integer(std::uint64_t magnitude) {
-    return MofInteger{false, magnitude};
-}
-
 TEST(MofParser, AnEmptyTextDeclaresNothing) {
     EXPECT_TRUE(declarations(" // nothing\n").empty());
 }
@@ -109,7 +105,7 @@ TEST(MofParser, ReadsQualifiersOfEveryForm) {
     const auto& all = declaration.properties.at(0).qualifiers;
     ASSERT_EQ(all.size(), 6U);
     EXPECT_FALSE(all[0].value);
-    EXPECT_EQ(all[1].value->elements.at(0).value, integer(16));
+    EXPECT_EQ(all[1].value->elements.at(0).value, MofConstant(MofInteger{false, 16}));
     EXPECT_EQ(all[2].value->elements.size(), 2U);
     EXPECT_EQ(all[2].value->elements.at(1).value, MofConstant(std::string("bc")));
     EXPECT_TRUE(all[3].value->isArray);

@@ -14,7 +14,7 @@ MofInitializer one(MofConstant constant) {
     return {false, {{std::move(constant), {3, 5}}}, {3, 5}};
 }
 
-MofConstant integer(std::uint64_t magnitude, bool negative = false) {
+MofConstant ofInteger(std::uint64_t magnitude, bool negative = false) {
     return MofInteger{negative, magnitude};
 }
 
@@ -40,25 +40,25 @@ TEST(MofValue, IntegersKeepTheRangeOfTheirType) {
           Range{Type::uint32, 4294967295, 0}, Range{Type::sint8, 127, 128},
           Range{Type::sint16, 32767, 32768}, Range{Type::sint32, 2147483647, 2147483648},
           Range{Type::sint64, two63 - 1, two63}}) {
-        EXPECT_EQ(errorOf(one(integer(range.largest)), range.type), "no error");
-        EXPECT_EQ(errorOf(one(integer(range.lowest, true)), range.type), "no error");
-        EXPECT_EQ(errorOf(one(integer(range.largest + 1)), range.type),
+        EXPECT_EQ(errorOf(one(ofInteger(range.largest)), range.type), "no error");
+        EXPECT_EQ(errorOf(one(ofInteger(range.lowest, true)), range.type), "no error");
+        EXPECT_EQ(errorOf(one(ofInteger(range.largest + 1)), range.type),
                   "f:3:5: " + std::to_string(range.largest + 1) + " does not fit " +
                       std::string(typeName(range.type)));
-        EXPECT_EQ(errorOf(one(integer(range.lowest + 1, true)), range.type),
+        EXPECT_EQ(errorOf(one(ofInteger(range.lowest + 1, true)), range.type),
                   "f:3:5: -" + std::to_string(range.lowest + 1) + " does not fit " +
                       std::string(typeName(range.type)));
     }
-    EXPECT_EQ(errorOf(one(integer(std::numeric_limits<std::uint64_t>::max())), Type::uint64),
+    EXPECT_EQ(errorOf(one(ofInteger(std::numeric_limits<std::uint64_t>::max())), Type::uint64),
               "no error");
 }
 
 TEST(MofValue, IntegersAreHeldInTheSignednessOfTheirType) {
-    EXPECT_EQ(typedValue(one(integer(5)), Type::uint8, false, "f"),
+    EXPECT_EQ(typedValue(one(ofInteger(5)), Type::uint8, false, "f"),
               (Value{Type::uint8, false, Scalar(std::uint64_t{5})}));
-    EXPECT_EQ(typedValue(one(integer(5)), Type::sint8, false, "f"),
+    EXPECT_EQ(typedValue(one(ofInteger(5)), Type::sint8, false, "f"),
               (Value{Type::sint8, false, Scalar(std::int64_t{5})}));
-    EXPECT_EQ(typedValue(one(integer(1ULL << 63U, true)), Type::sint64, false, "f"),
+    EXPECT_EQ(typedValue(one(ofInteger(1ULL << 63U, true)), Type::sint64, false, "f"),
               (Value{Type::sint64, false, Scalar(std::numeric_limits<std::int64_t>::min())}));
 }
 
@@ -69,7 +69,7 @@ TEST(MofValue, OtherTypesTakeTheirOwnLiterals) {
               (Value{Type::char16, false, Scalar(u'x')}));
     EXPECT_EQ(typedValue(one(1.5), Type::real32, false, "f"),
               (Value{Type::real32, false, Scalar(1.5)}));
-    EXPECT_EQ(typedValue(one(integer(2, true)), Type::real64, false, "f"),
+    EXPECT_EQ(typedValue(one(ofInteger(2, true)), Type::real64, false, "f"),
               (Value{Type::real64, false, Scalar(-2.0)}));
     EXPECT_EQ(typedValue(one(std::string("a")), Type::string, false, "f"), Value::ofString("a"));
 }
@@ -95,13 +95,13 @@ TEST(MofValue, NullFitsEverything) {
 }
 
 TEST(MofValue, ListsAreForArraysAndTheirElementsMayBeNull) {
-    const MofInitializer list{true, {{integer(1), {4, 1}}, {{}, {4, 4}}}, {3, 9}};
+    const MofInitializer list{true, {{ofInteger(1), {4, 1}}, {{}, {4, 4}}}, {3, 9}};
     EXPECT_EQ(typedValue(list, Type::uint8, true, "f"),
               (Value{Type::uint8, true, Array{std::uint64_t{1}, std::monostate()}}));
     EXPECT_EQ(typedValue({true, {}, {}}, Type::uint8, true, "f"),
               (Value{Type::uint8, true, Array()}));
     EXPECT_EQ(errorOf(list, Type::uint8), "f:3:9: one value is needed here, not a list");
-    EXPECT_EQ(errorOf(one(integer(1)), Type::uint8, true),
+    EXPECT_EQ(errorOf(one(ofInteger(1)), Type::uint8, true),
               "f:3:5: a list in braces is needed here");
     EXPECT_EQ(errorOf(list, Type::string, true), "f:4:1: this is not a value of type string");
 }
@@ -109,8 +109,9 @@ TEST(MofValue, ListsAreForArraysAndTheirElementsMayBeNull) {
 TEST(MofValue, ValuesOfAnotherTypeAreRefused) {
     EXPECT_EQ(errorOf(one(true), Type::uint8), "f:3:5: this is not a value of type uint8");
     EXPECT_EQ(errorOf(one(1.5), Type::uint8), "f:3:5: this is not a value of type uint8");
-    EXPECT_EQ(errorOf(one(integer(1)), Type::string), "f:3:5: this is not a value of type string");
-    EXPECT_EQ(errorOf(one(integer(1)), Type::boolean),
+    EXPECT_EQ(errorOf(one(ofInteger(1)), Type::string),
+              "f:3:5: this is not a value of type string");
+    EXPECT_EQ(errorOf(one(ofInteger(1)), Type::boolean),
               "f:3:5: this is not a value of type boolean");
     EXPECT_EQ(errorOf(one(std::string("a")), Type::char16),
               "f:3:5: this is not a value of type char16");

@@ -20,7 +20,6 @@ using NodeLexicon::Properties;
 using testing::ElementsAre;
 using testing::IsEmpty;
 
-constexpr std::int64_t now = 1'800'000'000;
 constexpr std::uint32_t index = 2;
 constexpr const char* leased = "198.51.100.7";
 constexpr const char* server = "198.51.100.1";

@@ -18,8 +18,8 @@ namespace {
 using NodeLexicon::Properties;
 using Servers = std::vector<std::string>;
 
-constexpr const char* client = "/usr/sbin/dhclient";
-constexpr const char* server = "/usr/sbin/dnsmasq";
+constexpr const char* dhclient = "/usr/sbin/dhclient";
+constexpr const char* dnsmasq = "/usr/sbin/dnsmasq";
 
 bool eventually(const std::function<bool()>& condition) {
     const auto end = std::chrono::steady_clock::now() + std::chrono::seconds{10};
@@ -32,11 +32,11 @@ bool eventually(const std::function<bool()>& condition) {
     return true;
 }
 
-#define ZR_NEEDS_DHCP()                                                   \
-    do {                                                                  \
-        if (::access(client, X_OK) != 0 || ::access(server, X_OK) != 0) { \
-            GTEST_SKIP() << "needs " << client << " and " << server;      \
-        }                                                                 \
+#define ZR_NEEDS_DHCP()                                                      \
+    do {                                                                     \
+        if (::access(dhclient, X_OK) != 0 || ::access(dnsmasq, X_OK) != 0) { \
+            GTEST_SKIP() << "needs " << dhclient << " and " << dnsmasq;      \
+        }                                                                    \
     } while (false)
 
 /// A cable whose far end, in another namespace, has a DHCP server; on the near end,
@@ -53,7 +53,7 @@ class Laboratory {
         const std::string there = "nsenter --net=/proc/" + far_.process() + "/ns/net ";
         run(there + "ip addr add 198.51.100.1/24 dev far");
         run(there + "ip link set far up");
-        run(there + server +
+        run(there + dnsmasq +
             " --conf-file=/dev/null --user=root --port=0 --interface=far --bind-interfaces"
             " --no-ping --dhcp-authoritative --dhcp-leasefile=/run/server.leases"
             " --pid-file=/run/server.pid --log-facility=/run/server.log"
@@ -87,7 +87,7 @@ class Watched {
 /// Starts the client, which goes to the background with its lease. It writes its
 /// process number only then, and it cannot be ended properly before.
 void start(const std::string& options) {
-    run(client + std::string{" -1 -pf /run/client.pid "} + options + " eth1 < /dev/null");
+    run(dhclient + std::string{" -1 -pf /run/client.pid "} + options + " eth1 < /dev/null");
     EXPECT_TRUE(eventually([] { return !File::read("/run/client.pid").value_or("").empty(); }));
 }
 
@@ -132,7 +132,7 @@ void liveThrough(const std::string& options, const char* leaseTime) {
     start(options);
     expectLeased(eth1);
 
-    run(client + std::string{" -r -pf /run/client.pid "} + options + " eth1 < /dev/null");
+    run(dhclient + std::string{" -r -pf /run/client.pid "} + options + " eth1 < /dev/null");
     EXPECT_TRUE(eventually(
         [&] { return eth1[Properties::DHCPServerAddresses] == PropertyValue{Servers{}}; }));
     EXPECT_TRUE(eventually([&] { return eth1[Properties::IPv4Address] == PropertyValue{}; }));

@@ -17,8 +17,6 @@ using NodeLexicon::Properties;
 using testing::ElementsAre;
 using testing::IsEmpty;
 
-constexpr std::int64_t now = 1'800'000'000;
-
 PropertyValue time(std::int64_t value) {
     return static_cast<std::uint64_t>(value);
 }

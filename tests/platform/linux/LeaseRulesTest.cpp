@@ -7,7 +7,6 @@
 namespace ZR::Live {
 namespace {
 
-constexpr std::int64_t now = 1'800'000'000;
 constexpr std::int64_t year = std::int64_t{365} * 24 * 3600;
 
 Lease leaseOf(Client client, std::optional<std::int64_t> expires) {

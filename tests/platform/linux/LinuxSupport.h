@@ -28,6 +28,9 @@
 
 namespace ZR::Live {
 
+/// The time in tests that look at no clock.
+inline constexpr std::int64_t now = 1'800'000'000;
+
 /// An address or the name of an interface as a test writes it.
 inline IpAddress ipAddress(std::string_view text) {
     return IpAddress::fromText(text.find(':') == std::string_view::npos ? AF_INET : AF_INET6, text)

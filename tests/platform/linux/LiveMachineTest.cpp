@@ -219,10 +219,10 @@ TEST_F(LiveMachineTest, CapturedReleaseLeavesTheOtherInterfaceItsServer) {
 TEST_F(LiveMachineTest, CapturedDhcpcdLeaseLivesUntilItsEnd) {
     root_.write("/var/lib/dhcpcd/eth1.lease", sample("dhcpcd-10/eth1.lease"));
     root_.age("/var/lib/dhcpcd/eth1.lease", now_);
-    const auto leased = [](std::uint32_t seconds) {
+    const auto leasedFor = [](std::uint32_t seconds) {
         return lasting(2, {198, 51, 100, 121}, seconds);
     };
-    LiveMachine& machine = open({links(1), leased(600), links(1), leased(0)});
+    LiveMachine& machine = open({links(1), leasedFor(600), links(1), leasedFor(0)});
     EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),
               PropertyValue{Servers{"198.51.100.1"}});
     now_ += 600;

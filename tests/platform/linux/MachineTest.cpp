@@ -15,8 +15,6 @@ using testing::ElementsAre;
 using testing::IsEmpty;
 using testing::Pointee;
 
-constexpr std::int64_t now = 1'800'000'000;
-
 /// Links eth2 and eth3, of these indexes, with 192.0.2.2 and 192.0.2.3.
 class MachineTest : public testing::Test {
   protected:

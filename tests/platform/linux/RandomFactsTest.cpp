@@ -19,7 +19,6 @@ namespace {
 using NodeLexicon::NodeType;
 using NodeLexicon::Properties;
 
-constexpr std::int64_t now = 1'800'000'000;
 constexpr int machines = 2'000;
 
 /// Random facts about few links, addresses and clients, so that many of them meet.

@@ -18,7 +18,7 @@ namespace {
 using ZR::Testing::LogCapture;
 using ZR::Testing::LogRecord;
 
-const std::string category = "Merrow.Test";
+const std::string sharedCategory = "Merrow.Test";
 constexpr unsigned threadCount = 16;
 constexpr unsigned linesOfEach = 1000;
 
@@ -45,9 +45,9 @@ TEST(TKLoggerThreads, LinesNeverMixAndNoneIsLost) {
         threads.emplace_back([id] {
             const std::string name = "thread" + std::to_string(id);
             for (unsigned i = 0; i < linesOfEach; ++i) {
-                TKLogger::logLevelMessage("F", name.c_str(), id, category, 1, nullptr, 0, 0,
+                TKLogger::logLevelMessage("F", name.c_str(), id, sharedCategory, 1, nullptr, 0, 0,
                                           payload(i));
-                TKLogger::traceLevelMessage("F", name.c_str(), id, category, 1, nullptr, 0, 0,
+                TKLogger::traceLevelMessage("F", name.c_str(), id, sharedCategory, 1, nullptr, 0, 0,
                                             payload(i));
             }
         });
@@ -68,7 +68,8 @@ TEST(TKLoggerThreads, FileIsRotatedUnderTheirHandsAndNoLineIsLost) {
     for (unsigned id = 0; id < 4; ++id) {
         threads.emplace_back([&running] {
             for (unsigned i = 0; i < linesOfEach; ++i) {
-                TKLogger::logLevelMessage("F", "f", 1, category, 1, nullptr, 0, 0, payload(i));
+                TKLogger::logLevelMessage("F", "f", 1, sharedCategory, 1, nullptr, 0, 0,
+                                          payload(i));
             }
             --running;
         });
@@ -105,8 +106,10 @@ TEST(TKLoggerThreads, ChannelsAreSetUpAnewMeanwhile) {
     for (unsigned id = 0; id < 4; ++id) {
         threads.emplace_back([&running] {
             for (unsigned i = 0; i < linesOfEach; ++i) {
-                TKLogger::logLevelMessage("F", "f", 1, category, 1, nullptr, 0, 0, payload(i));
-                TKLogger::traceLevelMessage("F", "f", 1, category, 1, nullptr, 0, 0, payload(i));
+                TKLogger::logLevelMessage("F", "f", 1, sharedCategory, 1, nullptr, 0, 0,
+                                          payload(i));
+                TKLogger::traceLevelMessage("F", "f", 1, sharedCategory, 1, nullptr, 0, 0,
+                                            payload(i));
             }
             --running;
         });

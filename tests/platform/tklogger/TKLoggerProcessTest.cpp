@@ -123,12 +123,12 @@ TEST_F(TKLoggerProcessTest, ProcessThatSaysNothingWritesNoDiagnostics) {
 TEST_F(TKLoggerProcessTest, LinesOfSeveralProcessesNeverMixAndNoneIsLost) {
     writeFile(config_, "LOG_SINK=file:" + log_ + "\nLOG_LEVEL=0\n");
     constexpr int processes = 4;
-    constexpr int linesOfEach = 1000;
+    constexpr int linesOfProcess = 1000;
     std::vector<std::thread> runners;
     for (int id = 0; id < processes; ++id) {
         runners.emplace_back([this, id] {
-            run({"log:1:" + std::to_string(linesOfEach) + ":" + std::string(200, 'x') + " process" +
-                 std::to_string(id)});
+            run({"log:1:" + std::to_string(linesOfProcess) + ":" + std::string(200, 'x') +
+                 " process" + std::to_string(id)});
         });
     }
     for (std::thread& runner : runners) {
@@ -142,7 +142,7 @@ TEST_F(TKLoggerProcessTest, LinesOfSeveralProcessesNeverMixAndNoneIsLost) {
     }
     EXPECT_EQ(next.size(), static_cast<std::size_t>(processes));
     for (const auto& [process, count] : next) {
-        EXPECT_EQ(count, linesOfEach) << process;
+        EXPECT_EQ(count, linesOfProcess) << process;
     }
 }
 

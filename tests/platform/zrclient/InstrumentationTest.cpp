@@ -12,7 +12,7 @@ using NodeLexicon::Properties;
 using testing::ElementsAre;
 using testing::IsEmpty;
 
-constexpr const char* machine = R"({ "nodes": [
+constexpr const char* machineText = R"({ "nodes": [
   { "type": "ComputerSystem", "description": "Computer", "properties": { "Name": "${HOSTNAME}" },
     "children": [
       { "type": "Network", "description": "Network", "children": [
@@ -36,7 +36,7 @@ class InstrumentationTest : public SnapshotTreeTest {
   protected:
     void SetUp() override {
         SnapshotTreeTest::SetUp();
-        show(machine);
+        show(machineText);
     }
 
     static std::string name(const Instrumentation& cursor) {

@@ -19,7 +19,7 @@ using test::staticInterface;
 using ::testing::ElementsAre;
 using ::testing::SizeIs;
 
-constexpr const char* className = "QVXZR_DHCPCapabilities";
+constexpr const char* capabilitiesClass = "QVXZR_DHCPCapabilities";
 
 class CMPIDHCPCapabilitiesTest : public test::TreeTest {
   protected:
@@ -28,17 +28,18 @@ class CMPIDHCPCapabilitiesTest : public test::TreeTest {
 
 TEST_F(CMPIDHCPCapabilitiesTest, PathWithoutInstanceIDGivesEveryInstance) {
     setTree({host({dhcpInterface("eth0"), staticInterface("eth1"), dhcpInterface("eth2")})});
-    EXPECT_THAT(keysOf(host_.enumerateNames(pathOf(className)), "InstanceID"),
+    EXPECT_THAT(keysOf(host_.enumerateNames(pathOf(capabilitiesClass)), "InstanceID"),
                 ElementsAre("eth0", "eth2"));
-    EXPECT_THAT(keysOf(host_.enumerateNames(pathOf(className, {{"Name", "eth0"}})), "InstanceID"),
-                ElementsAre("eth0", "eth2"));
+    EXPECT_THAT(
+        keysOf(host_.enumerateNames(pathOf(capabilitiesClass, {{"Name", "eth0"}})), "InstanceID"),
+        ElementsAre("eth0", "eth2"));
 }
 
 TEST_F(CMPIDHCPCapabilitiesTest, InstanceIDSelectsOne) {
     setTree({host({dhcpInterface("eth0"), dhcpInterface("eth2")})});
-    EXPECT_THAT(
-        keysOf(host_.enumerateNames(pathOf(className, {{"InstanceID", "eth2"}})), "InstanceID"),
-        ElementsAre("eth2"));
+    EXPECT_THAT(keysOf(host_.enumerateNames(pathOf(capabilitiesClass, {{"InstanceID", "eth2"}})),
+                       "InstanceID"),
+                ElementsAre("eth2"));
 }
 
 TEST_F(CMPIDHCPCapabilitiesTest, InstanceHasWhatIsKnownAndNothingElse) {
@@ -47,7 +48,7 @@ TEST_F(CMPIDHCPCapabilitiesTest, InstanceHasWhatIsKnownAndNothingElse) {
     readOnly["readOnly"] = {"Name"};
     auto bare = test::interface("eth2", {{"DHCPEnabled", true}});
     setTree({host({writable, readOnly, bare})});
-    const Host::Response response = host_.enumerate(pathOf(className));
+    const Host::Response response = host_.enumerate(pathOf(capabilitiesClass));
     ASSERT_THAT(response.instances, SizeIs(3));
     const auto edit = [&](std::size_t i) {
         const cimom::Value* value = response.instances[i]->property("ElementNameEditSupported");
@@ -73,7 +74,7 @@ TEST_F(CMPIDHCPCapabilitiesTest, AnEmptyListThatIsKnownIsAnEmptyArray) {
     setTree({host({dhcpInterface("eth0")})});
     const cimom::broker::RequestScope scope;
     CMPIObjectPath* path =
-        ZR::ProviderUtilities::createObjectPath(host_.broker(), className, "root/cimv2");
+        ZR::ProviderUtilities::createObjectPath(host_.broker(), capabilitiesClass, "root/cimv2");
     CMPIInstance* instance = ZR::ProviderUtilities::createInstance(host_.broker(), path);
     ASSERT_TRUE(ZR::ProviderUtilities::setProperty(host_.broker(), instance, "OptionsSupported",
                                                    std::vector<unsigned short>{}));

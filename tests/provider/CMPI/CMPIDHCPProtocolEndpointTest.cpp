@@ -25,7 +25,7 @@ using ::testing::IsEmpty;
 using ::testing::SizeIs;
 using ZR::Testing::LogCapture;
 
-constexpr const char* className = "QVXZR_DHCPProtocolEndpoint";
+constexpr const char* endpointClass = "QVXZR_DHCPProtocolEndpoint";
 
 class CMPIDHCPProtocolEndpointTest : public test::TreeTest {
   protected:
@@ -42,13 +42,13 @@ std::vector<std::string> propertyNames(const cimom::Instance& instance) {
 
 TEST_F(CMPIDHCPProtocolEndpointTest, PathHasTheFourKeysInTheirOrder) {
     setTree({host({dhcpInterface("eth0")})});
-    const Host::Response response = host_.enumerateNames(pathOf(className));
+    const Host::Response response = host_.enumerateNames(pathOf(endpointClass));
     ASSERT_THAT(response.paths, SizeIs(1));
     cimom::ObjectPath expected =
-        pathOf(className, {{"SystemCreationClassName", "QVXZR_ComputerSystem"},
-                           {"SystemName", hostName()},
-                           {"CreationClassName", className},
-                           {"Name", "eth0"}});
+        pathOf(endpointClass, {{"SystemCreationClassName", "QVXZR_ComputerSystem"},
+                               {"SystemName", hostName()},
+                               {"CreationClassName", endpointClass},
+                               {"Name", "eth0"}});
     EXPECT_EQ(*response.paths[0], expected);
     std::vector<std::string> order;
     for (const auto& key : response.paths[0]->keys) {
@@ -60,7 +60,7 @@ TEST_F(CMPIDHCPProtocolEndpointTest, PathHasTheFourKeysInTheirOrder) {
 
 TEST_F(CMPIDHCPProtocolEndpointTest, InstanceHasJustThePropertiesThatAreKnown) {
     setTree({host({dhcpInterface("eth0")})});
-    const Host::Response response = host_.enumerate(pathOf(className));
+    const Host::Response response = host_.enumerate(pathOf(endpointClass));
     ASSERT_THAT(response.instances, SizeIs(1));
     const cimom::Instance& instance = *response.instances[0];
     EXPECT_THAT(propertyNames(instance),
@@ -72,7 +72,7 @@ TEST_F(CMPIDHCPProtocolEndpointTest, InstanceHasJustThePropertiesThatAreKnown) {
     EXPECT_EQ(test::numberOf(instance, "RequestedState"), 2U);
     EXPECT_EQ(test::textOf(instance, "SystemCreationClassName"), "QVXZR_ComputerSystem");
     EXPECT_EQ(test::textOf(instance, "SystemName"), hostName());
-    EXPECT_EQ(test::textOf(instance, "CreationClassName"), className);
+    EXPECT_EQ(test::textOf(instance, "CreationClassName"), endpointClass);
     EXPECT_EQ(test::textOf(instance, "Description"), "Ethernet interface eth0");
     EXPECT_EQ(test::numberOf(instance, "EnabledState"), 2U);
     EXPECT_EQ(test::textOf(instance, "Name"), "eth0");
@@ -91,7 +91,7 @@ TEST_F(CMPIDHCPProtocolEndpointTest, InstanceHasJustThePropertiesThatAreKnown) {
 
 TEST_F(CMPIDHCPProtocolEndpointTest, EndpointWithoutALeaseHasNoLeaseProperties) {
     setTree({host({dhcpInterface("eth0")})});
-    const Host::Response response = host_.enumerate(pathOf(className));
+    const Host::Response response = host_.enumerate(pathOf(endpointClass));
     ASSERT_THAT(response.instances, SizeIs(1));
     for (const char* name : {"LeaseObtained", "LeaseExpires", "LeaseTime", "RenewalTime",
                              "RebindingTime", "InstallDate", "Caption"}) {
@@ -101,7 +101,7 @@ TEST_F(CMPIDHCPProtocolEndpointTest, EndpointWithoutALeaseHasNoLeaseProperties) 
 
 TEST_F(CMPIDHCPProtocolEndpointTest, StatesThatCannotBeReadAreZero) {
     setTree({host({test::interface("eth0", {{"DHCPEnabled", true}, {"AddressSource", 1}})})});
-    const Host::Response response = host_.enumerate(pathOf(className));
+    const Host::Response response = host_.enumerate(pathOf(endpointClass));
     ASSERT_THAT(response.instances, SizeIs(1));
     EXPECT_EQ(test::numberOf(*response.instances[0], "EnabledState"), 0U);
     EXPECT_EQ(test::numberOf(*response.instances[0], "ClientState"), 0U);
@@ -109,7 +109,7 @@ TEST_F(CMPIDHCPProtocolEndpointTest, StatesThatCannotBeReadAreZero) {
 
 TEST_F(CMPIDHCPProtocolEndpointTest, PathWithoutKeysGivesEveryEndpoint) {
     setTree({host({dhcpInterface("eth0"), dhcpInterface("eth1")})});
-    EXPECT_THAT(keysOf(host_.enumerateNames(pathOf(className)), "Name"),
+    EXPECT_THAT(keysOf(host_.enumerateNames(pathOf(endpointClass)), "Name"),
                 ElementsAre("eth0", "eth1"));
     const cimom::broker::RequestScope scope;
     ZR::DHCPClientProvider::CMPIDHCPProtocolEndpoint all(host_.broker(), nullptr, "root/cimv2");
@@ -123,30 +123,30 @@ TEST_F(CMPIDHCPProtocolEndpointTest, PathWithoutKeysGivesEveryEndpoint) {
 TEST_F(CMPIDHCPProtocolEndpointTest, NameAloneOrSystemNameAloneFilterByThatAlone) {
     setTree({host({dhcpInterface("eth0"), dhcpInterface("eth1")}),
              serviceProcessor({dhcpInterface("eth0")})});
-    const auto byName = host_.enumerateNames(pathOf(className, {{"Name", "eth0"}}));
+    const auto byName = host_.enumerateNames(pathOf(endpointClass, {{"Name", "eth0"}}));
     EXPECT_THAT(keysOf(byName, "SystemName"), ElementsAre(hostName(), "BMC:-1"));
-    const auto bySystem = host_.enumerateNames(pathOf(className, {{"SystemName", "BMC:-1"}}));
+    const auto bySystem = host_.enumerateNames(pathOf(endpointClass, {{"SystemName", "BMC:-1"}}));
     EXPECT_THAT(keysOf(bySystem, "Name"), ElementsAre("eth0"));
     EXPECT_THAT(keysOf(bySystem, "SystemCreationClassName"), ElementsAre("QVXZR_SPComputerSystem"));
 }
 
 TEST_F(CMPIDHCPProtocolEndpointTest, OtherKeysAreNotCompared) {
     setTree({host({dhcpInterface("eth0")})});
-    const auto response =
-        host_.enumerateNames(pathOf(className, {{"CreationClassName", "Another_Class"},
-                                                {"SystemCreationClassName", "Another_System"}}));
+    const auto response = host_.enumerateNames(pathOf(
+        endpointClass,
+        {{"CreationClassName", "Another_Class"}, {"SystemCreationClassName", "Another_System"}}));
     EXPECT_THAT(keysOf(response, "Name"), ElementsAre("eth0"));
 }
 
 TEST_F(CMPIDHCPProtocolEndpointTest, KeysThatMatchNothingGiveAnEmptyWalk) {
     setTree({host({dhcpInterface("eth0")})});
-    EXPECT_THAT(host_.enumerateNames(pathOf(className, {{"Name", "eth7"}})).paths, IsEmpty());
+    EXPECT_THAT(host_.enumerateNames(pathOf(endpointClass, {{"Name", "eth7"}})).paths, IsEmpty());
 }
 
 TEST_F(CMPIDHCPProtocolEndpointTest, PropertyListDoesNotShrinkTheInstance) {
     setTree({host({dhcpInterface("eth0")})});
     const char* list[] = {"Name", nullptr};
-    const Host::Response response = host_.enumerate(pathOf(className), list);
+    const Host::Response response = host_.enumerate(pathOf(endpointClass), list);
     ASSERT_THAT(response.instances, SizeIs(1));
     EXPECT_THAT(response.instances[0]->properties, SizeIs(13));
 }
@@ -155,7 +155,7 @@ TEST_F(CMPIDHCPProtocolEndpointTest, KeyWhoseGetterFailsIsLeftOut) {
     setTree({host({{{"type", "NetworkInterface"},
                     {"description", "nameless"},
                     {"properties", {{"DHCPEnabled", true}}}}})});
-    const Host::Response response = host_.enumerate(pathOf(className));
+    const Host::Response response = host_.enumerate(pathOf(endpointClass));
     ASSERT_THAT(response.instances, SizeIs(1));
     // A name that cannot be read is the empty name; there is no element name then.
     EXPECT_EQ(test::textOf(*response.instances[0], "Name"), "");
@@ -195,7 +195,7 @@ TEST_F(CMPIDHCPProtocolEndpointTest, NullFromTheBrokerGivesNull) {
 TEST_F(CMPIDHCPProtocolEndpointTest, TracesItsOperationsInItsOwnName) {
     setTree({host({dhcpInterface("eth0")})});
     const LogCapture log;
-    host_.enumerate(pathOf(className, {{"Name", "eth0"}}));
+    host_.enumerate(pathOf(endpointClass, {{"Name", "eth0"}}));
     std::vector<std::string> own;
     for (const auto& line : log.log()) {
         if (line.file == "CMPI/CMPIDHCPProtocolEndpoint") {

@@ -22,7 +22,7 @@ using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 using ::testing::SizeIs;
 
-constexpr const char* className = "QVXZR_DHCPRemoteServiceAccessPoint";
+constexpr const char* accessPointClass = "QVXZR_DHCPRemoteServiceAccessPoint";
 
 class CMPIDHCPRemoteServiceAccessPointTest : public test::TreeTest {
   protected:
@@ -31,7 +31,7 @@ class CMPIDHCPRemoteServiceAccessPointTest : public test::TreeTest {
 
 TEST_F(CMPIDHCPRemoteServiceAccessPointTest, OneInstancePerServerAddress) {
     setTree({host({dhcpInterface("eth0", {"192.0.2.1", "2001:db8::1"}), dhcpInterface("eth1")})});
-    const Host::Response response = host_.enumerate(pathOf(className));
+    const Host::Response response = host_.enumerate(pathOf(accessPointClass));
     ASSERT_THAT(response.instances, SizeIs(2));
     const cimom::Instance& first = *response.instances[0];
     EXPECT_EQ(test::textOf(first, "ElementName"), "DHCP Server");
@@ -40,7 +40,7 @@ TEST_F(CMPIDHCPRemoteServiceAccessPointTest, OneInstancePerServerAddress) {
     EXPECT_EQ(test::numberOf(first, "AccessContext"), 7U);
     EXPECT_EQ(test::textOf(first, "SystemCreationClassName"), "QVXZR_ComputerSystem");
     EXPECT_EQ(test::textOf(first, "SystemName"), hostName());
-    EXPECT_EQ(test::textOf(first, "CreationClassName"), className);
+    EXPECT_EQ(test::textOf(first, "CreationClassName"), accessPointClass);
     EXPECT_EQ(test::textOf(first, "Name"), "eth0_IPv4");
     EXPECT_THAT(first.properties, SizeIs(8));
     const cimom::Instance& second = *response.instances[1];
@@ -51,7 +51,7 @@ TEST_F(CMPIDHCPRemoteServiceAccessPointTest, OneInstancePerServerAddress) {
 
 TEST_F(CMPIDHCPRemoteServiceAccessPointTest, ServerOfTheServiceProcessorHasTheHostsName) {
     setTree({serviceProcessor({dhcpInterface("bmc0", {"192.0.2.1"})})});
-    const Host::Response response = host_.enumerateNames(pathOf(className));
+    const Host::Response response = host_.enumerateNames(pathOf(accessPointClass));
     EXPECT_THAT(keysOf(response, "SystemName"), ElementsAre(hostName()));
     EXPECT_THAT(keysOf(response, "SystemCreationClassName"), ElementsAre("QVXZR_SPComputerSystem"));
 }
@@ -60,8 +60,9 @@ TEST_F(CMPIDHCPRemoteServiceAccessPointTest, NameAloneSelectsAcrossAllSystems) {
     // A name without a "_" of its own is never rejected.
     setTree({host({dhcpInterface("eth0", {"192.0.2.1"})}),
              serviceProcessor({dhcpInterface("bmc0", {"192.0.2.2"})})});
-    EXPECT_THAT(keysOf(host_.enumerateNames(pathOf(className, {{"Name", "eth0_IPv4"}})), "Name"),
-                ElementsAre("eth0_IPv4", "bmc0_IPv4"));
+    EXPECT_THAT(
+        keysOf(host_.enumerateNames(pathOf(accessPointClass, {{"Name", "eth0_IPv4"}})), "Name"),
+        ElementsAre("eth0_IPv4", "bmc0_IPv4"));
 }
 
 TEST_F(CMPIDHCPRemoteServiceAccessPointTest, SystemNameOfAnotherComputerSelectsNothingFurther) {
@@ -69,14 +70,14 @@ TEST_F(CMPIDHCPRemoteServiceAccessPointTest, SystemNameOfAnotherComputerSelectsN
     // The filter moves the cursor past the end, but the addresses that were loaded
     // before stay: their one record is still there, without a path to tell.
     const Host::Response response =
-        host_.enumerateNames(pathOf(className, {{"SystemName", "elsewhere"}}));
+        host_.enumerateNames(pathOf(accessPointClass, {{"SystemName", "elsewhere"}}));
     ASSERT_THAT(response.paths, SizeIs(1));
     EXPECT_EQ(test::keyOf(*response.paths[0], "Name"), "_IPv4");
 }
 
 TEST_F(CMPIDHCPRemoteServiceAccessPointTest, NoServersGiveNothing) {
     setTree({host({dhcpInterface("eth0"), test::interface("eth1")})});
-    EXPECT_THAT(host_.enumerate(pathOf(className)).instances, IsEmpty());
+    EXPECT_THAT(host_.enumerate(pathOf(accessPointClass)).instances, IsEmpty());
 }
 
 TEST_F(CMPIDHCPRemoteServiceAccessPointTest, ServerWhoseAddressCannotBeReadHasNoAccessInfo) {
@@ -89,7 +90,7 @@ TEST_F(CMPIDHCPRemoteServiceAccessPointTest, ServerWhoseAddressCannotBeReadHasNo
         ZR::DHCPClientProvider::property<&Element::getAccessInfo>("AccessInfo")};
     CMPIStatus status{CMPI_RC_OK, nullptr};
     const CMPIObjectPath* path =
-        host_.broker()->eft->newObjectPath(host_.broker(), "root/cimv2", className, &status);
+        host_.broker()->eft->newObjectPath(host_.broker(), "root/cimv2", accessPointClass, &status);
     const CMPIInstance* instance =
         ZR::DHCPClientProvider::makeInstance<Element>(host_.broker(), path, Element(), properties);
     ASSERT_NE(instance, nullptr);
@@ -101,7 +102,7 @@ TEST_F(CMPIDHCPRemoteServiceAccessPointTest, ServerWhoseAddressCannotBeReadHasNo
 TEST_F(CMPIDHCPRemoteServiceAccessPointTest, InterfaceWhoseServersCannotBeReadHasNoAccessPoint) {
     setTree({R"({"type": "NetworkInterface", "properties": {
         "Name": "eth0", "DHCPServerAddresses": ["192.0.2.1", 2]}})"});
-    EXPECT_THAT(host_.enumerate(pathOf(className)).instances, IsEmpty());
+    EXPECT_THAT(host_.enumerate(pathOf(accessPointClass)).instances, IsEmpty());
 }
 
 TEST_F(CMPIDHCPRemoteServiceAccessPointTest, AnAdapterPastItsAddressesHasNoPathAndNoInstance) {

@@ -25,7 +25,7 @@ using ::testing::SizeIs;
 using ZR::Testing::readFile;
 using ZR::Testing::writeFile;
 
-constexpr const char* className = "QVXZR_DHCPSettingData";
+constexpr const char* settingClass = "QVXZR_DHCPSettingData";
 
 class CMPIDHCPSettingDataTest : public test::TreeTest {
   protected:
@@ -37,13 +37,13 @@ class CMPIDHCPSettingDataTest : public test::TreeTest {
     }
 
     static cimom::ObjectPath pathOfSetting(const std::string& instanceId) {
-        return pathOf(className, {{"InstanceID", instanceId}});
+        return pathOf(settingClass, {{"InstanceID", instanceId}});
     }
 
     /// A client's instance with these properties.
     static cimom::Instance instanceWith(std::vector<cimom::NamedValue> properties) {
         cimom::Instance instance;
-        instance.path = pathOf(className);
+        instance.path = pathOf(settingClass);
         instance.properties = std::move(properties);
         return instance;
     }
@@ -56,7 +56,7 @@ class CMPIDHCPSettingDataTest : public test::TreeTest {
 };
 
 TEST_F(CMPIDHCPSettingDataTest, EveryInterfaceHasASetting) {
-    EXPECT_THAT(keysOf(host_.enumerateNames(pathOf(className)), "InstanceID"),
+    EXPECT_THAT(keysOf(host_.enumerateNames(pathOf(settingClass)), "InstanceID"),
                 ElementsAre("Computer%eth0", "Computer%eth1"));
     EXPECT_THAT(keysOf(host_.enumerateNames(pathOfSetting("Computer%eth1")), "InstanceID"),
                 ElementsAre("Computer%eth1"));
@@ -65,7 +65,7 @@ TEST_F(CMPIDHCPSettingDataTest, EveryInterfaceHasASetting) {
 
 TEST_F(CMPIDHCPSettingDataTest, InstanceHasWhatIsKnownAndNothingElse) {
     writeFile(file("eth0"), "CONFIG_NAME=office\n");
-    const Host::Response response = host_.enumerate(pathOf(className));
+    const Host::Response response = host_.enumerate(pathOf(settingClass));
     ASSERT_THAT(response.instances, SizeIs(2));
     const cimom::Instance& setting = *response.instances[0];
     EXPECT_EQ(test::textOf(setting, "InstanceID"), "Computer%eth0");
@@ -82,7 +82,7 @@ TEST_F(CMPIDHCPSettingDataTest, InstanceHasWhatIsKnownAndNothingElse) {
 
 TEST_F(CMPIDHCPSettingDataTest, WithoutAFileOrWithAnEmptyNameThereIsNoConfigurationName) {
     writeFile(file("eth1"), "CONFIG_NAME=\n");
-    const Host::Response response = host_.enumerate(pathOf(className));
+    const Host::Response response = host_.enumerate(pathOf(settingClass));
     ASSERT_THAT(response.instances, SizeIs(2));
     for (const auto& instance : response.instances) {
         EXPECT_EQ(instance->property("ConfigurationName"), nullptr);

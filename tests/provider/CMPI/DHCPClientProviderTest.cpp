@@ -25,8 +25,8 @@ using ::testing::IsEmpty;
 using ::testing::SizeIs;
 using ZR::Testing::LogCapture;
 
-constexpr const char* endpointClass = "QVXZR_DHCPProtocolEndpoint";
-constexpr const char* settingClass = "QVXZR_DHCPSettingData";
+constexpr const char* endpointName = "QVXZR_DHCPProtocolEndpoint";
+constexpr const char* settingName = "QVXZR_DHCPSettingData";
 
 /// The entering and exiting lines of the frame in few words.
 std::vector<std::string> flow(const LogCapture& log) {
@@ -131,7 +131,7 @@ TEST_F(DHCPClientProviderTest, CleanupAnswersOkWhetherTerminatingOrNotAndTracesN
 // From class names to identifiers.
 
 TEST_F(DHCPClientProviderTest, ServedClassNameGivesItsIdentifierWithoutAskingTheBroker) {
-    EXPECT_THAT(identifiers(settingClass), ElementsAre(85));
+    EXPECT_THAT(identifiers(settingName), ElementsAre(85));
     EXPECT_EQ(host_.counted().calls(Function::classPathIsA), 0U);
 }
 
@@ -163,13 +163,13 @@ TEST_F(DHCPClientProviderTest, NoClassNameStandsForAllSeven) {
 
 TEST_F(DHCPClientProviderTest, IdentifiersAreAppendedAndNullNamespaceIsLegal) {
     std::vector<unsigned short> ids{1};
-    EXPECT_TRUE(ZR::DHCPClientProvider::getClassId(settingClass, nullptr, ids));
+    EXPECT_TRUE(ZR::DHCPClientProvider::getClassId(settingName, nullptr, ids));
     EXPECT_FALSE(ZR::DHCPClientProvider::getClassId("No_SuchClass", nullptr, ids));
     EXPECT_THAT(ids, ElementsAre(1, 85));
 }
 
 TEST_F(DHCPClientProviderTest, ClassIdentificationTracesItsEntryAndExit) {
-    for (const char* name : {settingClass, "CIM_HostedAccessPoint", "No_SuchClass"}) {
+    for (const char* name : {settingName, "CIM_HostedAccessPoint", "No_SuchClass"}) {
         const LogCapture log;
         identifiers(name);
         EXPECT_THAT(flow(log), ElementsAre(entering("getClassId"), exiting("getClassId"))) << name;
@@ -184,7 +184,7 @@ TEST_F(DHCPClientProviderTest, ClassIdentificationTracesItsEntryAndExit) {
 
 TEST_F(DHCPClientProviderTest, EndpointNamesAreDeliveredAndTheResultIsClosedOnce) {
     setTree({host({dhcpInterface("eth0"), staticInterface("eth1"), dhcpInterface("eth2")})});
-    const Host::Response response = host_.enumerateNames(pathOf(endpointClass));
+    const Host::Response response = host_.enumerateNames(pathOf(endpointName));
     EXPECT_EQ(response.code, CMPI_RC_OK);
     EXPECT_FALSE(response.hasMessage);
     EXPECT_THAT(keysOf(response, "Name"), ElementsAre("eth0", "eth2"));
@@ -194,7 +194,7 @@ TEST_F(DHCPClientProviderTest, EndpointNamesAreDeliveredAndTheResultIsClosedOnce
 TEST_F(DHCPClientProviderTest, SettingDataIsDeliveredWhollyAndTheResultIsLeftOpen) {
     setTree({host({dhcpInterface("eth0"), staticInterface("eth1")}),
              serviceProcessor({dhcpInterface("bmc0")})});
-    const Host::Response response = host_.enumerateNames(pathOf(settingClass));
+    const Host::Response response = host_.enumerateNames(pathOf(settingName));
     EXPECT_EQ(response.code, CMPI_RC_OK);
     EXPECT_THAT(keysOf(response, "InstanceID"),
                 ElementsAre("Computer%eth0", "Computer%eth1", "BMC%bmc0"));
@@ -220,11 +220,11 @@ TEST_P(ResultEndings, AreUnevenAsClientsKnowThem) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Elements, ResultEndings,
-                         ::testing::Values(EndingCase{endpointClass, 1, 1, 1},
+                         ::testing::Values(EndingCase{endpointName, 1, 1, 1},
                                            EndingCase{"QVXZR_DHCPCapabilities", 1, 1, 1},
                                            EndingCase{"QVXZR_DHCPRemoteServiceAccessPoint", 0, 0,
                                                       0},
-                                           EndingCase{settingClass, 0, 0, 0}),
+                                           EndingCase{settingName, 0, 0, 0}),
                          [](const auto& each) { return std::string(each.param.className); });
 
 TEST_F(DHCPClientProviderTest, UnknownClassIsInvalidWithoutResultsOrAnEnd) {
@@ -244,7 +244,7 @@ TEST_F(DHCPClientProviderTest, UnknownClassIsInvalidWithoutResultsOrAnEnd) {
 
 TEST_F(DHCPClientProviderTest, AnyNamespaceIsServedAndKept) {
     setTree({host({dhcpInterface("eth0")})});
-    cimom::ObjectPath path = pathOf(endpointClass);
+    cimom::ObjectPath path = pathOf(endpointName);
     path.nameSpace = "root/elsewhere";
     const Host::Response response = host_.enumerateNames(path);
     ASSERT_THAT(response.paths, SizeIs(1));
@@ -253,14 +253,14 @@ TEST_F(DHCPClientProviderTest, AnyNamespaceIsServedAndKept) {
 
 TEST_F(DHCPClientProviderTest, GetYieldsWhatThePathNames) {
     setTree({host({dhcpInterface("eth0"), dhcpInterface("eth1")})});
-    const Host::Response response = host_.get(pathOf(endpointClass, {{"Name", "eth1"}}));
+    const Host::Response response = host_.get(pathOf(endpointName, {{"Name", "eth1"}}));
     ASSERT_THAT(response.instances, SizeIs(1));
     EXPECT_EQ(test::textOf(*response.instances[0], "Name"), "eth1");
 }
 
 TEST_F(DHCPClientProviderTest, GetOfAMissingObjectIsAnEmptySuccess) {
     setTree({host({dhcpInterface("eth0")})});
-    const Host::Response response = host_.get(pathOf(endpointClass, {{"Name", "eth9"}}));
+    const Host::Response response = host_.get(pathOf(endpointName, {{"Name", "eth9"}}));
     EXPECT_EQ(response.code, CMPI_RC_OK);
     EXPECT_THAT(response.instances, IsEmpty());
     EXPECT_EQ(response.returnDoneCalls, 1U);
@@ -306,8 +306,8 @@ TEST_F(DHCPClientProviderTest, CreateDeleteAndQueryAreRefusedWhateverTheirArgume
 }
 
 TEST_F(DHCPClientProviderTest, ModifyOfAnotherClassIsNotSupportedAndDoesNotCloseTheResult) {
-    for (const char* name : {endpointClass, "QVXZR_DHCPCapabilities", "QVXZR_HostedDHCPPoint",
-                             "CIM_DHCPSettingData"}) {
+    for (const char* name :
+         {endpointName, "QVXZR_DHCPCapabilities", "QVXZR_HostedDHCPPoint", "CIM_DHCPSettingData"}) {
         const cimom::Instance instance;
         const Host::Response response = host_.modify(pathOf(name), &instance);
         EXPECT_EQ(response.code, CMPI_RC_ERR_NOT_SUPPORTED) << name;
@@ -318,9 +318,9 @@ TEST_F(DHCPClientProviderTest, ModifyOfAnotherClassIsNotSupportedAndDoesNotClose
 TEST_F(DHCPClientProviderTest, ModifyOfAMissingSettingSucceedsAndClosesTheResult) {
     setTree({host({dhcpInterface("eth0")})});
     cimom::Instance instance;
-    instance.path = pathOf(settingClass);
+    instance.path = pathOf(settingName);
     const Host::Response response =
-        host_.modify(pathOf(settingClass, {{"InstanceID", "Computer%eth9"}}), &instance);
+        host_.modify(pathOf(settingName, {{"InstanceID", "Computer%eth9"}}), &instance);
     EXPECT_EQ(response.code, CMPI_RC_OK);
     EXPECT_EQ(response.returnDoneCalls, 1U);
 }
@@ -328,7 +328,7 @@ TEST_F(DHCPClientProviderTest, ModifyOfAMissingSettingSucceedsAndClosesTheResult
 TEST_F(DHCPClientProviderTest, ModifyThatFailsGivesItsCodeWithoutAMessage) {
     setTree({host({dhcpInterface("eth0")})});
     const Host::Response response =
-        host_.modify(pathOf(settingClass, {{"InstanceID", "Computer%eth0"}}), nullptr);
+        host_.modify(pathOf(settingName, {{"InstanceID", "Computer%eth0"}}), nullptr);
     EXPECT_EQ(response.code, CMPI_RC_ERR_FAILED);
     EXPECT_FALSE(response.hasMessage);
     EXPECT_EQ(response.returnDoneCalls, 1U);
@@ -337,9 +337,9 @@ TEST_F(DHCPClientProviderTest, ModifyThatFailsGivesItsCodeWithoutAMessage) {
 TEST_F(DHCPClientProviderTest, ModifyTracesThePathAsText) {
     setTree({host({dhcpInterface("eth0")})});
     cimom::Instance instance;
-    instance.path = pathOf(settingClass);
+    instance.path = pathOf(settingName);
     const LogCapture log;
-    host_.modify(pathOf(settingClass, {{"InstanceID", "Computer%eth0"}}), &instance);
+    host_.modify(pathOf(settingName, {{"InstanceID", "Computer%eth0"}}), &instance);
     EXPECT_THAT(log.logMessages(),
                 ::testing::Contains(::testing::AllOf(HasSubstr("'l_strObjectPath'"),
                                                      HasSubstr("InstanceID=\"Computer%eth0\""))));
@@ -351,7 +351,7 @@ TEST_F(DHCPClientProviderTest, ExceptionHalfWayLeavesWhatWasDeliveredAndTheStatu
     setTree({host({dhcpInterface("eth0"), dhcpInterface("eth1"), dhcpInterface("eth2")})});
     const LogCapture log(6000, 6000);
     host_.counted().fail(Function::newObjectPath, 2, Fault::exception);
-    const Host::Response response = host_.enumerate(pathOf(endpointClass));
+    const Host::Response response = host_.enumerate(pathOf(endpointName));
     EXPECT_EQ(response.code, CMPI_RC_OK);
     EXPECT_FALSE(response.hasMessage);
     ASSERT_THAT(response.instances, SizeIs(1));
@@ -371,7 +371,7 @@ TEST_F(DHCPClientProviderTest, ExitIsMarkedAfterAnExceptionToo) {
     setTree({host({dhcpInterface("eth0")})});
     const LogCapture log(4000);
     host_.counted().fail(Function::newObjectPath, 1, Fault::exception);
-    host_.enumerateNames(pathOf(endpointClass));
+    host_.enumerateNames(pathOf(endpointName));
     const auto messages = log.logMessages();
     ASSERT_GE(messages.size(), 2U);
     EXPECT_THAT(messages[messages.size() - 2],
@@ -385,7 +385,7 @@ TEST_F(DHCPClientProviderTest, ObjectThatTheBrokerRefusesIsPassedOverWithOneFail
         setTree({host({dhcpInterface("eth0"), dhcpInterface("eth1"), dhcpInterface("eth2")})});
         const LogCapture log(6000, 6000);
         host_.counted().fail(Function::newInstance, 2, fault);
-        const Host::Response response = host_.enumerate(pathOf(endpointClass));
+        const Host::Response response = host_.enumerate(pathOf(endpointName));
         EXPECT_EQ(response.code, CMPI_RC_OK);
         ASSERT_THAT(response.instances, SizeIs(2));
         EXPECT_EQ(test::textOf(response.instances[0].value(), "Name"), "eth0");

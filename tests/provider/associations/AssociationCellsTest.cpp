@@ -158,7 +158,7 @@ std::string name(const ::testing::TestParamInfo<Cell>& info) {
 
 // Computer system and DHCP protocol endpoint.
 
-constexpr const char* hosted = "QVXZR_HostedDHCPPoint";
+constexpr const char* hostedPoint = "QVXZR_HostedDHCPPoint";
 
 const std::string hostedEth0 =
     "HostedDHCPPoint Antecedent[ComputerSystem @] Dependent[DHCPProtocolEndpoint @ eth0]";
@@ -171,17 +171,17 @@ const Texts allHosted{
 
 INSTANTIATE_TEST_SUITE_P(
     HostedDHCPPoint, AssociationCells,
-    ::testing::Values(Cell{"FromAComputer", hosted, computer, allEndpoints, allHosted},
-                      Cell{"FromAnEndpoint", hosted, eth1, {"ComputerSystem @"}, {hostedEth1}},
-                      Cell{"FromItsOwnClass", hosted, hosted, {}, allHosted, 4},
-                      Cell{"FromAComputerWithoutKeys", hosted, keylessComputer, allEndpoints,
+    ::testing::Values(Cell{"FromAComputer", hostedPoint, computer, allEndpoints, allHosted},
+                      Cell{"FromAnEndpoint", hostedPoint, eth1, {"ComputerSystem @"}, {hostedEth1}},
+                      Cell{"FromItsOwnClass", hostedPoint, hostedPoint, {}, allHosted, 4},
+                      Cell{"FromAComputerWithoutKeys", hostedPoint, keylessComputer, allEndpoints,
                            allHosted},
                       Cell{"FromAnEndpointWithoutKeys",
-                           hosted,
+                           hostedPoint,
                            keylessEndpoint,
                            {"ComputerSystem @"},
                            {hostedEth0}},
-                      Cell{"FromAnotherClass", hosted, stranger, {}, {}}),
+                      Cell{"FromAnotherClass", hostedPoint, stranger, {}, {}}),
     name);
 
 // IP protocol endpoint and DHCP protocol endpoint.
@@ -263,7 +263,7 @@ INSTANTIATE_TEST_SUITE_P(
 
 // Computer system and remote access point.
 
-constexpr const char* remoteHosted = "QVXZR_DHCPRemoteHostedAccessPoint";
+constexpr const char* remoteHostedPoint = "QVXZR_DHCPRemoteHostedAccessPoint";
 
 const std::string remoteHostedEth0 =
     "DHCPRemoteHostedAccessPoint Antecedent[ComputerSystem @] "
@@ -277,17 +277,21 @@ const Texts allRemoteHosted{remoteHostedEth0,
 INSTANTIATE_TEST_SUITE_P(
     RemoteHostedAccessPoint, AssociationCells,
     ::testing::Values(
-        Cell{"FromAComputer", remoteHosted, computer, allServers, allRemoteHosted},
-        Cell{"FromAnAccessPoint", remoteHosted, server, {"ComputerSystem @"}, {remoteHostedEth0}},
-        Cell{"FromItsOwnClass", remoteHosted, remoteHosted, {}, allRemoteHosted, 3},
-        Cell{"FromAComputerWithoutKeys", remoteHosted, keylessComputer, allServers,
+        Cell{"FromAComputer", remoteHostedPoint, computer, allServers, allRemoteHosted},
+        Cell{"FromAnAccessPoint",
+             remoteHostedPoint,
+             server,
+             {"ComputerSystem @"},
+             {remoteHostedEth0}},
+        Cell{"FromItsOwnClass", remoteHostedPoint, remoteHostedPoint, {}, allRemoteHosted, 3},
+        Cell{"FromAComputerWithoutKeys", remoteHostedPoint, keylessComputer, allServers,
              allRemoteHosted},
         Cell{"FromAnAccessPointWithoutKeys",
-             remoteHosted,
+             remoteHostedPoint,
              keylessServer,
              {"ComputerSystem @"},
              {remoteHostedEth0}},
-        Cell{"FromAnotherClass", remoteHosted, eth1, {}, {}}),
+        Cell{"FromAnotherClass", remoteHostedPoint, eth1, {}, {}}),
     name);
 
 // Remote access point and DHCP protocol endpoint.

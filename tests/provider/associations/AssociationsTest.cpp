@@ -285,19 +285,20 @@ TEST_F(AssociationsTest, EndpointAndCapabilitiesLeadToEachOther) {
     constexpr const char* name = "QVXZR_DHCPElementCapabilities";
     EXPECT_EQ(briefs(host_.associatorNames(endpoint("eth1"), name)),
               Texts{"DHCPCapabilities eth1"});
-    const auto capabilities = pathOf("QVXZR_DHCPCapabilities", {{"InstanceID", "eth1"}});
-    EXPECT_EQ(briefs(host_.associators(capabilities, name)),
+    const auto capabilitiesPath = pathOf("QVXZR_DHCPCapabilities", {{"InstanceID", "eth1"}});
+    EXPECT_EQ(briefs(host_.associators(capabilitiesPath, name)),
               ofHost(Texts{"DHCPProtocolEndpoint @ eth1"}));
-    const Host::Response references = host_.references(capabilities, name);
+    const Host::Response references = host_.references(capabilitiesPath, name);
     ASSERT_THAT(references.instances, SizeIs(1));
     EXPECT_EQ(references.instances[0]->property("Characteristics"), nullptr);
 }
 
 TEST_F(AssociationsTest, AccessPointAndItsComputerLeadToEachOther) {
     constexpr const char* name = "QVXZR_DHCPRemoteHostedAccessPoint";
-    const auto accessPoint = pathOf("QVXZR_DHCPRemoteServiceAccessPoint",
-                                    {{"SystemName", hostName()}, {"Name", "eth0_IPv4"}});
-    EXPECT_EQ(briefs(host_.associatorNames(accessPoint, name)), ofHost(Texts{"ComputerSystem @"}));
+    const auto accessPointPath = pathOf("QVXZR_DHCPRemoteServiceAccessPoint",
+                                        {{"SystemName", hostName()}, {"Name", "eth0_IPv4"}});
+    EXPECT_EQ(briefs(host_.associatorNames(accessPointPath, name)),
+              ofHost(Texts{"ComputerSystem @"}));
     EXPECT_THAT(briefs(host_.associators(computer(hostName()), name)), SizeIs(3));
     EXPECT_EQ(briefs(host_.enumerateNames(pathOf(name))),
               ofHost(Texts{"DHCPRemoteHostedAccessPoint Antecedent[ComputerSystem @] "
@@ -331,14 +332,14 @@ TEST_F(AssociationsTest, OrderOfAccessOfAReferenceDependsOnWhereTheWalkStarted) 
         }
         return values;
     };
-    const auto accessPoint = [](const char* key) {
+    const auto accessPointPath = [](const char* key) {
         return pathOf("QVXZR_DHCPRemoteServiceAccessPoint",
                       {{"SystemName", hostName()}, {"Name", key}});
     };
     // One server: untouched. Several: 0 after the look-up from the access point.
-    EXPECT_THAT(order(host_.references(accessPoint("eth0_IPv4"), name)), ElementsAre(1));
-    EXPECT_THAT(order(host_.references(accessPoint("eth1_IPv4"), name)), ElementsAre(0));
-    EXPECT_THAT(briefs(host_.associatorNames(accessPoint("eth1_IPv4"), name)),
+    EXPECT_THAT(order(host_.references(accessPointPath("eth0_IPv4"), name)), ElementsAre(1));
+    EXPECT_THAT(order(host_.references(accessPointPath("eth1_IPv4"), name)), ElementsAre(0));
+    EXPECT_THAT(briefs(host_.associatorNames(accessPointPath("eth1_IPv4"), name)),
                 ElementsAre(ofHost("DHCPProtocolEndpoint @ eth1")));
 }
 
@@ -354,10 +355,10 @@ TEST_F(AssociationsTest, EndpointAndSettingLeadToEachOther) {
     constexpr const char* name = "QVXZR_DHCPElementSettingData";
     EXPECT_EQ(briefs(host_.associatorNames(endpoint("eth2"), name)),
               Texts{"DHCPSettingData Computer%eth2"});
-    const auto setting = pathOf("QVXZR_DHCPSettingData", {{"InstanceID", "Computer%eth2"}});
-    EXPECT_EQ(briefs(host_.associators(setting, name)),
+    const auto settingPath = pathOf("QVXZR_DHCPSettingData", {{"InstanceID", "Computer%eth2"}});
+    EXPECT_EQ(briefs(host_.associators(settingPath, name)),
               ofHost(Texts{"DHCPProtocolEndpoint @ eth2"}));
-    const Host::Response references = host_.references(setting, name);
+    const Host::Response references = host_.references(settingPath, name);
     ASSERT_THAT(references.instances, SizeIs(1));
     EXPECT_EQ(test::numberOf(*references.instances[0], "IsCurrent"), 1U);
     EXPECT_EQ(references.instances[0]->property("IsCurrent")->type, cimom::Type::uint16);
@@ -377,14 +378,14 @@ TEST_F(AssociationsTest, EnumerationOfElementSettingDataEndsAtAnInterfaceWithout
 
 TEST_F(AssociationsTest, SettingAndAssignmentLeadToEachOther) {
     constexpr const char* name = "QVXZR_DHCPOrderedComponent";
-    const auto setting = pathOf("QVXZR_DHCPSettingData", {{"InstanceID", "Computer%eth3"}});
-    EXPECT_EQ(briefs(host_.associators(setting, name)),
+    const auto settingPath = pathOf("QVXZR_DHCPSettingData", {{"InstanceID", "Computer%eth3"}});
+    EXPECT_EQ(briefs(host_.associators(settingPath, name)),
               Texts{"IPAssignmentSettingData Computer%eth3%dhcp"});
-    const auto assignment =
+    const auto assignmentPath =
         pathOf("QVXZR_IPAssignmentSettingData", {{"InstanceID", "Computer%eth3%dhcp"}});
-    EXPECT_EQ(briefs(host_.associatorNames(assignment, name)),
+    EXPECT_EQ(briefs(host_.associatorNames(assignmentPath, name)),
               Texts{"DHCPSettingData Computer%eth3"});
-    const Host::Response references = host_.references(assignment, name);
+    const Host::Response references = host_.references(assignmentPath, name);
     ASSERT_THAT(references.instances, SizeIs(1));
     EXPECT_EQ(test::numberOf(*references.instances[0], "AssignedSequence"), 1U);
     EXPECT_EQ(references.instances[0]->property("AssignedSequence")->type, cimom::Type::uint64);
@@ -526,12 +527,12 @@ TEST_F(SeveralComputersTest, EndpointAndAccessPointReachAllButTheLast) {
     EXPECT_EQ(briefs(host_.associatorNames(endpoint("eth1"), hosted)), computers);
     EXPECT_EQ(briefs(host_.associators(endpoint("eth1"), hosted)), computers);
     EXPECT_THAT(briefs(host_.referenceNames(endpoint("eth1"), hosted)), SizeIs(2));
-    const auto accessPoint = pathOf("QVXZR_DHCPRemoteServiceAccessPoint",
-                                    {{"SystemName", hostName()}, {"Name", "eth1_IPv4"}});
+    const auto accessPointPath = pathOf("QVXZR_DHCPRemoteServiceAccessPoint",
+                                        {{"SystemName", hostName()}, {"Name", "eth1_IPv4"}});
     constexpr const char* remoteHosted = "QVXZR_DHCPRemoteHostedAccessPoint";
-    EXPECT_EQ(briefs(host_.associatorNames(accessPoint, remoteHosted)), computers);
-    EXPECT_EQ(briefs(host_.associators(accessPoint, remoteHosted)), computers);
-    EXPECT_THAT(briefs(host_.referenceNames(accessPoint, remoteHosted)), SizeIs(2));
+    EXPECT_EQ(briefs(host_.associatorNames(accessPointPath, remoteHosted)), computers);
+    EXPECT_EQ(briefs(host_.associators(accessPointPath, remoteHosted)), computers);
+    EXPECT_THAT(briefs(host_.referenceNames(accessPointPath, remoteHosted)), SizeIs(2));
 }
 
 // Failures in one association.

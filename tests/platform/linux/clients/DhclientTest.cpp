@@ -23,12 +23,12 @@ namespace {
 using testing::ElementsAre;
 using testing::IsEmpty;
 
-std::optional<ClientProcess> parse(std::vector<std::string_view> arguments) {
+std::optional<ClientProcess> parsedDhclient(std::vector<std::string_view> arguments) {
     return parseDhclientArguments(arguments);
 }
 
-ClientProcess process(std::vector<InterfaceName> interfaces, std::string leaseFile = "",
-                      bool ipv6 = false) {
+ClientProcess dhclientProcess(std::vector<InterfaceName> interfaces, std::string leaseFile = "",
+                              bool ipv6 = false) {
     return {.client = Client::Dhclient,
             .interfaces = std::move(interfaces),
             .leaseFile = std::move(leaseFile),
@@ -42,43 +42,43 @@ std::string lease(const std::string& interfaceName, const std::string& address,
 }
 
 TEST(DhclientArguments, WithoutAnInterfaceItRunsOnAll) {
-    EXPECT_EQ(parse({"dhclient"}), process({}));
-    EXPECT_EQ(parse({"/sbin/dhclient", "-v", "-1"}), process({}));
+    EXPECT_EQ(parsedDhclient({"dhclient"}), dhclientProcess({}));
+    EXPECT_EQ(parsedDhclient({"/sbin/dhclient", "-v", "-1"}), dhclientProcess({}));
 }
 
 TEST(DhclientArguments, AsIfupdownStartsIt) {
-    EXPECT_EQ(parse({"/sbin/dhclient", "-4", "-v", "-i", "-pf", "/run/dhclient.eth1.pid", "-lf",
-                     "/var/lib/dhcp/dhclient.eth1.leases", "-I", "-df",
-                     "/var/lib/dhcp/dhclient6.eth1.leases", "eth1"}),
-              process({"eth1"_name}, "/var/lib/dhcp/dhclient.eth1.leases"));
+    EXPECT_EQ(parsedDhclient({"/sbin/dhclient", "-4", "-v", "-i", "-pf", "/run/dhclient.eth1.pid",
+                              "-lf", "/var/lib/dhcp/dhclient.eth1.leases", "-I", "-df",
+                              "/var/lib/dhcp/dhclient6.eth1.leases", "eth1"}),
+              dhclientProcess({"eth1"_name}, "/var/lib/dhcp/dhclient.eth1.leases"));
 }
 
 TEST(DhclientArguments, AsNetworkManagerStartsIt) {
-    EXPECT_EQ(parse({"/sbin/dhclient", "-d", "-q", "-sf", "/usr/libexec/nm-dhcp-helper", "-pf",
-                     "/run/NetworkManager/dhclient-eth1.pid", "-lf",
-                     "/var/lib/NetworkManager/dhclient-1-eth1.lease", "-cf",
-                     "/var/lib/NetworkManager/dhclient-eth1.conf", "eth1"}),
-              process({"eth1"_name}, "/var/lib/NetworkManager/dhclient-1-eth1.lease"));
+    EXPECT_EQ(parsedDhclient({"/sbin/dhclient", "-d", "-q", "-sf", "/usr/libexec/nm-dhcp-helper",
+                              "-pf", "/run/NetworkManager/dhclient-eth1.pid", "-lf",
+                              "/var/lib/NetworkManager/dhclient-1-eth1.lease", "-cf",
+                              "/var/lib/NetworkManager/dhclient-eth1.conf", "eth1"}),
+              dhclientProcess({"eth1"_name}, "/var/lib/NetworkManager/dhclient-1-eth1.lease"));
 }
 
 TEST(DhclientArguments, ValuesOfOptionsAreNotInterfaces) {
-    EXPECT_EQ(
-        parse({"dhclient", "-6", "-e", "A=b", "-s", "192.0.2.1", "-g", "192.0.2.2", "-p", "1068",
-               "-D", "LL", "--dad-wait-time", "3", "-H", "host", "-w", "eth1", "eth2"}),
-        process({"eth1"_name, "eth2"_name}, "", true));
+    EXPECT_EQ(parsedDhclient({"dhclient", "-6", "-e", "A=b", "-s", "192.0.2.1", "-g", "192.0.2.2",
+                              "-p", "1068", "-D", "LL", "--dad-wait-time", "3", "-H", "host", "-w",
+                              "eth1", "eth2"}),
+              dhclientProcess({"eth1"_name, "eth2"_name}, "", true));
 }
 
 TEST(DhclientArguments, AClientThatGivesItsLeaseBackIsNone) {
-    EXPECT_EQ(parse({"dhclient", "-r", "eth1"}), std::nullopt);
-    EXPECT_EQ(parse({"dhclient", "-x"}), std::nullopt);
+    EXPECT_EQ(parsedDhclient({"dhclient", "-r", "eth1"}), std::nullopt);
+    EXPECT_EQ(parsedDhclient({"dhclient", "-x"}), std::nullopt);
 }
 
 TEST(DhclientArguments, AProcessWithoutArgumentsIsNone) {
-    EXPECT_EQ(parse({}), std::nullopt);
+    EXPECT_EQ(parsedDhclient({}), std::nullopt);
 }
 
 TEST(DhclientArguments, AValueThatIsMissingIsEmpty) {
-    EXPECT_EQ(parse({"dhclient", "-lf"}), process({}));
+    EXPECT_EQ(parsedDhclient({"dhclient", "-lf"}), dhclientProcess({}));
 }
 
 class DhclientTest : public testing::Test {
@@ -180,7 +180,7 @@ TEST_F(DhclientTest, CapturedUnderNetworkManager) {
         root_.age("/var/lib/NetworkManager/" + (name + profile), name[8] == '6' ? 1 : 2);
     }
     const ClientFacts facts =
-        read({process({"eth1"_name}, "/var/lib/NetworkManager/dhclient-" + profile)});
+        read({dhclientProcess({"eth1"_name}, "/var/lib/NetworkManager/dhclient-" + profile)});
     EXPECT_EQ(claims(facts),
               (std::vector<Lease>{
                   {.client = Client::Dhclient,
@@ -237,7 +237,8 @@ TEST_F(DhclientTest, TheGoodBlocksOfADamagedFileCount) {
 TEST_F(DhclientTest, ALeaseTellsItsTimesItsOptionsAndItsClient) {
     root_.write("/var/lib/dhcp/dhclient6.eth1.leases",
                 sample("isc-dhclient/dhclient6.eth1.leases"));
-    ClientProcess client = process({"eth1"_name}, "/var/lib/dhcp/dhclient6.eth1.leases", true);
+    ClientProcess client =
+        dhclientProcess({"eth1"_name}, "/var/lib/dhcp/dhclient6.eth1.leases", true);
     client.pid = 17;
     const ClientFacts facts = read({client});
     ASSERT_EQ(facts.leases.size(), 1U);
@@ -257,7 +258,7 @@ TEST_F(DhclientTest, AFileThatOthersMayWriteIsNotBelieved) {
     root_.write(file, lease("eth1", "192.0.2.7", "192.0.2.1"));
     ASSERT_EQ(::chmod(root_.path("").c_str(), 0755), 0);
     ASSERT_EQ(::chmod(root_.path("/var/lib/dhcp").c_str(), 0777), 0);
-    const ClientFacts facts = read({process({"eth1"_name}, file)});
+    const ClientFacts facts = read({dhclientProcess({"eth1"_name}, file)});
     EXPECT_THAT(facts.leases, IsEmpty());
     const Diagnostic expected{
         root_.path(file) + " is not trusted: every user may change " + root_.path("/var/lib/dhcp"),
@@ -278,7 +279,7 @@ TEST_F(DhclientTest, OnlyTheUserOfItsClientMayOwnAFile) {
     ASSERT_EQ(::chmod(root_.path("").c_str(), 0755), 0);
     ASSERT_EQ(::chown(root_.path(file).c_str(), nobody, nobody), 0);
     EXPECT_THAT(read().leases, IsEmpty());
-    ClientProcess client = process({"eth1"_name});
+    ClientProcess client = dhclientProcess({"eth1"_name});
     EXPECT_THAT(read({client}).leases, IsEmpty());
     client.user = nobody;
     const ClientFacts facts = read({client});
@@ -301,7 +302,7 @@ TEST_F(DhclientTest, WhatALinkLeadsToIsWatched) {
 
 TEST_F(DhclientTest, TheFileOfARunningClientIsReadWhereverItLies) {
     root_.write("/srv/leases/own.db", lease("eth1", "192.0.2.7", "192.0.2.1"));
-    const ClientFacts facts = read({process({"eth1"_name}, "/srv/leases/own.db")});
+    const ClientFacts facts = read({dhclientProcess({"eth1"_name}, "/srv/leases/own.db")});
     ASSERT_EQ(facts.leases.size(), 1U);
     EXPECT_TRUE(facts.leases[0].clientAlive);
     EXPECT_EQ(facts.places, (std::vector<WatchedPlace>{
@@ -311,7 +312,8 @@ TEST_F(DhclientTest, TheFileOfARunningClientIsReadWhereverItLies) {
 TEST_F(DhclientTest, AFileIsReadOnceHoweverManyNamesItHas) {
     root_.write("/var/lib/dhcp/dhclient.eth1.leases", lease("eth1", "192.0.2.7", "192.0.2.1"));
     ASSERT_EQ(::symlink("dhcp", root_.path("/var/lib/alias").c_str()), 0);
-    const ClientFacts facts = read({process({"eth1"_name}, "/var/lib/alias/dhclient.eth1.leases")});
+    const ClientFacts facts =
+        read({dhclientProcess({"eth1"_name}, "/var/lib/alias/dhclient.eth1.leases")});
     ASSERT_EQ(facts.leases.size(), 1U);
     EXPECT_TRUE(facts.leases[0].clientAlive);
 }
@@ -327,10 +329,10 @@ TEST_F(DhclientTest, OnlyTheClientThatKeepsTheFileIsBehindItsLeases) {
         return states;
     };
     EXPECT_THAT(alive({}), ElementsAre(false, false));
-    EXPECT_THAT(alive({process({})}), ElementsAre(true, true));
-    EXPECT_THAT(alive({process({"eth2"_name})}), ElementsAre(false, true));
-    EXPECT_THAT(alive({process({}, "/elsewhere")}), ElementsAre(false, false));
-    EXPECT_THAT(alive({process({}, "", true)}), ElementsAre(false, false));
+    EXPECT_THAT(alive({dhclientProcess({})}), ElementsAre(true, true));
+    EXPECT_THAT(alive({dhclientProcess({"eth2"_name})}), ElementsAre(false, true));
+    EXPECT_THAT(alive({dhclientProcess({}, "/elsewhere")}), ElementsAre(false, false));
+    EXPECT_THAT(alive({dhclientProcess({}, "", true)}), ElementsAre(false, false));
 }
 
 /// A relative file name, of a process of which this process file system tells.
@@ -345,7 +347,7 @@ class RelativeDhclientTest : public DhclientTest {
     }
     ClientFacts readOf(const std::string& leaseFile) const {
         ClientFacts facts;
-        facts.processes = {process({"eth1"_name}, leaseFile)};
+        facts.processes = {dhclientProcess({"eth1"_name}, leaseFile)};
         facts.processes[0].pid = 17;
         readDhclient({.files = "", .proc = root_.path("/proc")}, facts);
         // What the machine itself has is not of this test.
@@ -417,7 +419,7 @@ TEST(DhclientProcessFiles, OfARealKernel) {
             char done = 'n';
             EXPECT_EQ(::read(ready[0], &done, 1), 1);
             ::close(ready[0]);
-            ClientProcess client = process({}, path);
+            ClientProcess client = dhclientProcess({}, path);
             client.pid = child;
             std::vector<Diagnostic> diagnostics;
             const auto file = fileOfProcess({}, client, path, diagnostics);

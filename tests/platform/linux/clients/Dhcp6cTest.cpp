@@ -9,7 +9,7 @@
 namespace ZR::Live {
 namespace {
 
-std::optional<ClientProcess> parse(std::vector<std::string_view> arguments) {
+std::optional<ClientProcess> parsedDhcp6c(std::vector<std::string_view> arguments) {
     return parseDhcp6cArguments(arguments);
 }
 
@@ -21,19 +21,19 @@ TEST(Dhcp6cArguments, Captured) {
         texts.push_back(word);
     }
     EXPECT_EQ(
-        parse({texts.begin(), texts.end()}),
+        parsedDhcp6c({texts.begin(), texts.end()}),
         (ClientProcess{
             .client = Client::Dhcp6c, .interfaces = {"eth1"_name}, .leaseFile = "", .ipv6 = true}));
 }
 
 TEST(Dhcp6cArguments, ItsInterfacesStandBehindTheOptions) {
-    EXPECT_EQ(parse({"/usr/sbin/dhcp6c", "-Pdefault", "-p", "/run/dhcp6c.pid", "-c", "conf", "-f",
-                     "eth1", "eth2"}),
+    EXPECT_EQ(parsedDhcp6c({"/usr/sbin/dhcp6c", "-Pdefault", "-p", "/run/dhcp6c.pid", "-c", "conf",
+                            "-f", "eth1", "eth2"}),
               (ClientProcess{.client = Client::Dhcp6c,
                              .interfaces = {"eth1"_name, "eth2"_name},
                              .leaseFile = "",
                              .ipv6 = true}));
-    EXPECT_EQ(parse({}), std::nullopt);
+    EXPECT_EQ(parsedDhcp6c({}), std::nullopt);
 }
 
 }  // namespace

@@ -15,10 +15,10 @@ using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
 
-std::optional<ClientProcess> parse(std::vector<std::string_view> arguments) {
+std::optional<ClientProcess> parsedDhcpcd(std::vector<std::string_view> arguments) {
     return parseDhcpcdArguments(arguments);
 }
-ClientProcess process(std::vector<InterfaceName> interfaces, bool ipv6 = false) {
+ClientProcess dhcpcdProcess(std::vector<InterfaceName> interfaces, bool ipv6 = false) {
     return {.client = Client::Dhcpcd,
             .interfaces = std::move(interfaces),
             .leaseFile = "",
@@ -26,10 +26,10 @@ ClientProcess process(std::vector<InterfaceName> interfaces, bool ipv6 = false) 
 }
 
 TEST(DhcpcdArguments, ARunningOneSaysWhatItDoes) {
-    EXPECT_EQ(parse({"dhcpcd: eth1 [ip4] [ip6]"}), process({"eth1"_name}));
-    EXPECT_EQ(parse({"dhcpcd: eth1 [ip6]"}), process({"eth1"_name}, true));
-    EXPECT_EQ(parse({"dhcpcd: [manager] [ip4] [ip6]"}), process({}));
-    EXPECT_EQ(parse({"dhcpcd: [master] [ip4]"}), process({}));
+    EXPECT_EQ(parsedDhcpcd({"dhcpcd: eth1 [ip4] [ip6]"}), dhcpcdProcess({"eth1"_name}));
+    EXPECT_EQ(parsedDhcpcd({"dhcpcd: eth1 [ip6]"}), dhcpcdProcess({"eth1"_name}, true));
+    EXPECT_EQ(parsedDhcpcd({"dhcpcd: [manager] [ip4] [ip6]"}), dhcpcdProcess({}));
+    EXPECT_EQ(parsedDhcpcd({"dhcpcd: [master] [ip4]"}), dhcpcdProcess({}));
 }
 
 TEST(DhcpcdArguments, ItsHelpersAreNotClients) {
@@ -37,22 +37,23 @@ TEST(DhcpcdArguments, ItsHelpersAreNotClients) {
          {"dhcpcd: [privileged proxy] eth1 [ip4] [ip6]", "dhcpcd: [network proxy] 198.51.100.7",
           "dhcpcd: [control proxy] eth1 [ip4]", "dhcpcd: [BPF ARP] eth1 198.51.100.107",
           "dhcpcd: [BPF BOOTP] eth1", "dhcpcd: [launcher]", "dhcpcd: "}) {
-        EXPECT_EQ(parse({title}), std::nullopt) << title;
+        EXPECT_EQ(parsedDhcpcd({title}), std::nullopt) << title;
     }
 }
 
 TEST(DhcpcdArguments, BeforeItSaysSoItsArgumentsTell) {
-    EXPECT_EQ(parse({"dhcpcd"}), process({}));
-    EXPECT_EQ(parse({"/usr/sbin/dhcpcd", "-q", "-t", "30", "--config", "/c", "-Bd", "eth1"}),
-              process({"eth1"_name}));
-    EXPECT_EQ(parse({"dhcpcd", "-6", "eth1", "eth2"}), process({"eth1"_name, "eth2"_name}, true));
-    EXPECT_EQ(parse({}), std::nullopt);
+    EXPECT_EQ(parsedDhcpcd({"dhcpcd"}), dhcpcdProcess({}));
+    EXPECT_EQ(parsedDhcpcd({"/usr/sbin/dhcpcd", "-q", "-t", "30", "--config", "/c", "-Bd", "eth1"}),
+              dhcpcdProcess({"eth1"_name}));
+    EXPECT_EQ(parsedDhcpcd({"dhcpcd", "-6", "eth1", "eth2"}),
+              dhcpcdProcess({"eth1"_name, "eth2"_name}, true));
+    EXPECT_EQ(parsedDhcpcd({}), std::nullopt);
 }
 
 TEST(DhcpcdArguments, ACommandToAnotherOneIsNotAClient) {
     for (const char* command :
          {"-k", "-x", "-n", "-U", "-T", "--release", "--exit", "--dumplease", "--test"}) {
-        EXPECT_EQ(parse({"dhcpcd", command, "eth1"}), std::nullopt) << command;
+        EXPECT_EQ(parsedDhcpcd({"dhcpcd", command, "eth1"}), std::nullopt) << command;
     }
 }
 
@@ -135,10 +136,10 @@ TEST_F(DhcpcdTest, ARunningOneOfTheLinkOrOfAllKeepsTheLease) {
     const auto alive = [&](const ClientProcess& process) {
         return read({process}).leases.at(0).clientAlive;
     };
-    EXPECT_TRUE(alive(process({"eth1"_name})));
-    EXPECT_TRUE(alive(process({})));
-    EXPECT_FALSE(alive(process({"eth2"_name})));
-    ClientProcess other = process({});
+    EXPECT_TRUE(alive(dhcpcdProcess({"eth1"_name})));
+    EXPECT_TRUE(alive(dhcpcdProcess({})));
+    EXPECT_FALSE(alive(dhcpcdProcess({"eth2"_name})));
+    ClientProcess other = dhcpcdProcess({});
     other.client = Client::Dhclient;
     EXPECT_FALSE(alive(other));
 }
@@ -221,8 +222,8 @@ class RunningDhcpcdTest : public DhcpcdTest {
         found.pid = 7;
         return read({std::move(found)});
     }
-    [[nodiscard]] ClientFacts named() const { return seen(process({"eth1"_name})); }
-    [[nodiscard]] ClientFacts ofAll() const { return seen(process({})); }
+    [[nodiscard]] ClientFacts named() const { return seen(dhcpcdProcess({"eth1"_name})); }
+    [[nodiscard]] ClientFacts ofAll() const { return seen(dhcpcdProcess({})); }
 
     /// "4", "6" or both: under which protocols a link of the facts is.
     static std::string protocols(const ClientFacts& facts) {
@@ -262,7 +263,7 @@ TEST_F(RunningDhcpcdTest, OneOfALinkHasItUnderDhcpFromItsStart) {
     run("eth1 [ip4] [ip6]");
     EXPECT_EQ(protocols(named()), "4");
     run("eth1 [ip6]");
-    EXPECT_EQ(protocols(seen(process({"eth1"_name}, true))), "6");
+    EXPECT_EQ(protocols(seen(dhcpcdProcess({"eth1"_name}, true))), "6");
 }
 
 TEST_F(RunningDhcpcdTest, BesideDhcpV4OnlyALeaseShowsThatDhcpV6IsUsed) {

@@ -25,7 +25,7 @@ NetworkdDescription describe(const std::string& json) {
     EXPECT_NE(facts, nullptr) << std::get<std::string_view>(parsed);
     return facts == nullptr ? NetworkdDescription{} : *facts;
 }
-std::vector<NetworkdAddress> parse(const std::string& json) {
+std::vector<NetworkdAddress> parsedStatus(const std::string& json) {
     return describe(json).addresses;
 }
 
@@ -45,7 +45,7 @@ constexpr std::int64_t systemStart = 1'795'213'000 * second;
 
 TEST(NetworkdDescription, CapturedByVersion252) {
     EXPECT_THAT(
-        parse(sample("networkd/networkctl-status-eth1.json")),
+        parsedStatus(sample("networkd/networkctl-status-eth1.json")),
         ElementsAre(address("fe80::5054:ff:fe00:5"_ip, "foreign"),
                     address("198.51.100.110"_ip, "DHCPv4", "198.51.100.1"_ip, 2, 2'790'836'929),
                     address("2001:db8:99::1b2"_ip, "DHCPv6", "fe80::e0cb:10ff:feee:2799"_ip, 2,
@@ -55,7 +55,7 @@ TEST(NetworkdDescription, CapturedByVersion252) {
 
 TEST(NetworkdDescription, CapturedByVersion257) {
     EXPECT_THAT(
-        parse(sample("networkd-257/networkctl-status-eth1.json")),
+        parsedStatus(sample("networkd-257/networkctl-status-eth1.json")),
         ElementsAre(address("2001:db8:99::1d3"_ip, "DHCPv6", "fe80::e0cb:10ff:feee:2799"_ip, 2,
                             3'420'984'167),
                     address("fe80::5054:ff:fe00:6"_ip, "foreign"),
@@ -78,7 +78,7 @@ TEST(NetworkdDescription, CapturedByVersion257) {
 }
 
 TEST(NetworkdDescription, CapturedStaticAndLinkLocal) {
-    EXPECT_THAT(parse(sample("networkd/networkctl-static-linklocal.json")),
+    EXPECT_THAT(parsedStatus(sample("networkd/networkctl-static-linklocal.json")),
                 ElementsAre(address("fe80::c452:2fff:fee3:97d"_ip, "foreign", {}, 3),
                             address("169.254.105.80"_ip, "IPv4LL", {}, 3),
                             address("198.51.100.30"_ip, "static", {}, 3)));
@@ -86,7 +86,7 @@ TEST(NetworkdDescription, CapturedStaticAndLinkLocal) {
 
 TEST(NetworkdDescription, OfAllLinksAtOnce) {
     EXPECT_THAT(
-        parse(R"({"Interfaces":[
+        parsedStatus(R"({"Interfaces":[
         {"Index":1,"Addresses":[{"Family":2,"Address":[127,0,0,1],"ConfigSource":"foreign"}]},
         {"Index":7},
         {"Index":2,"Addresses":[{"Family":2,"Address":[192,0,2,7],"ConfigSource":"static"}]}]})"),
@@ -94,15 +94,16 @@ TEST(NetworkdDescription, OfAllLinksAtOnce) {
 }
 
 TEST(NetworkdDescription, WhatIsNotAnAddressIsSkipped) {
-    EXPECT_THAT(parse(R"({"Index":2,"Addresses":[7,{},{"Family":2},{"Family":2,"Address":"x"},
+    EXPECT_THAT(
+        parsedStatus(R"({"Index":2,"Addresses":[7,{},{"Family":2},{"Family":2,"Address":"x"},
         {"Family":2,"Address":[1,2,3]},{"Family":2,"Address":[1,2,3,256]},
         {"Family":2,"Address":[1,2,3,-4]},{"Family":10,"Address":[1,2,3,4]},
         {"Family":300,"Address":[1,2,3,4]},{"Family":"2","Address":[1,2,3,4]},
         {"Family":2,"Address":[192,0,2,7],"ConfigSource":7,"ConfigProvider":[1]}]})"),
-                ElementsAre(address("192.0.2.7"_ip, "")));
-    EXPECT_THAT(parse("{}"), IsEmpty());
-    EXPECT_THAT(parse(R"({"Index":-2,"Addresses":[]})"), IsEmpty());
-    EXPECT_THAT(parse(R"({"Index":2,"Addresses":{}})"), IsEmpty());
+        ElementsAre(address("192.0.2.7"_ip, "")));
+    EXPECT_THAT(parsedStatus("{}"), IsEmpty());
+    EXPECT_THAT(parsedStatus(R"({"Index":-2,"Addresses":[]})"), IsEmpty());
+    EXPECT_THAT(parsedStatus(R"({"Index":2,"Addresses":{}})"), IsEmpty());
 }
 
 TEST(NetworkdDescription, OtherTextsHaveAReason) {

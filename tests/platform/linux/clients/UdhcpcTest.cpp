@@ -17,10 +17,10 @@ namespace {
 using testing::ElementsAre;
 using testing::IsEmpty;
 
-std::optional<ClientProcess> parse(std::vector<std::string_view> arguments) {
+std::optional<ClientProcess> parsedUdhcpc(std::vector<std::string_view> arguments) {
     return parseUdhcpcArguments(arguments);
 }
-ClientProcess process(const std::string& interface, bool ipv6 = false) {
+ClientProcess udhcpcProcess(const std::string& interface, bool ipv6 = false) {
     return {.client = Client::Udhcpc,
             .interfaces = {interfaceName(interface)},
             .leaseFile = "",
@@ -34,29 +34,29 @@ TEST(UdhcpcArguments, Captured) {
     for (std::string word; words >> word;) {
         texts.push_back(word);
     }
-    EXPECT_EQ(parse({texts.begin(), texts.end()}), process("eth1"));
+    EXPECT_EQ(parsedUdhcpc({texts.begin(), texts.end()}), udhcpcProcess("eth1"));
 }
 
 TEST(UdhcpcArguments, WithoutAnInterfaceItIsEth0) {
-    EXPECT_EQ(parse({"udhcpc"}), process("eth0"));
-    EXPECT_EQ(parse({"udhcpc", "-i"}), process("eth0"));
-    EXPECT_EQ(parse({"udhcpc", "-i", "a/b"}), process("eth0"));
+    EXPECT_EQ(parsedUdhcpc({"udhcpc"}), udhcpcProcess("eth0"));
+    EXPECT_EQ(parsedUdhcpc({"udhcpc", "-i"}), udhcpcProcess("eth0"));
+    EXPECT_EQ(parsedUdhcpc({"udhcpc", "-i", "a/b"}), udhcpcProcess("eth0"));
 }
 
 TEST(UdhcpcArguments, TheInterfaceMayBeNamedInManyWays) {
-    EXPECT_EQ(parse({"/sbin/udhcpc", "-bieth1"}), process("eth1"));
-    EXPECT_EQ(parse({"udhcpc", "--interface=eth1"}), process("eth1"));
-    EXPECT_EQ(parse({"udhcpc", "-s", "-i", "--interface", "eth1", "-x", "hostname:i"}),
-              process("eth1"));
-    EXPECT_EQ(parse({"udhcpc6", "-i", "eth1"}), process("eth1", true));
+    EXPECT_EQ(parsedUdhcpc({"/sbin/udhcpc", "-bieth1"}), udhcpcProcess("eth1"));
+    EXPECT_EQ(parsedUdhcpc({"udhcpc", "--interface=eth1"}), udhcpcProcess("eth1"));
+    EXPECT_EQ(parsedUdhcpc({"udhcpc", "-s", "-i", "--interface", "eth1", "-x", "hostname:i"}),
+              udhcpcProcess("eth1"));
+    EXPECT_EQ(parsedUdhcpc({"udhcpc6", "-i", "eth1"}), udhcpcProcess("eth1", true));
 }
 
 TEST(UdhcpcArguments, BusyboxIsMuchElseToo) {
-    EXPECT_EQ(parse({"busybox", "udhcpc", "-i", "eth1"}), process("eth1"));
-    EXPECT_EQ(parse({"/bin/busybox", "udhcpc6", "-i", "eth1"}), process("eth1", true));
+    EXPECT_EQ(parsedUdhcpc({"busybox", "udhcpc", "-i", "eth1"}), udhcpcProcess("eth1"));
+    EXPECT_EQ(parsedUdhcpc({"/bin/busybox", "udhcpc6", "-i", "eth1"}), udhcpcProcess("eth1", true));
     for (const std::vector<std::string_view>& arguments :
          {std::vector<std::string_view>{"busybox", "sh"}, {"busybox"}, {"sh"}, {}}) {
-        EXPECT_EQ(parse(arguments), std::nullopt);
+        EXPECT_EQ(parsedUdhcpc(arguments), std::nullopt);
     }
 }
 
@@ -83,7 +83,7 @@ TEST_F(UdhcpcTest, WhatAScriptIsGivenTellsTheLease) {
     // The script's environment as it was captured, from the second event on.
     const std::string events = sample("udhcpc/hook-script-environment.txt");
     write(events.substr(events.find("== bound")));
-    EXPECT_THAT(read({process("eth1")}).leases,
+    EXPECT_THAT(read({udhcpcProcess("eth1")}).leases,
                 ElementsAre(Lease{.client = Client::Udhcpc,
                                   .interfaceName = "eth1"_name,
                                   .address = "198.51.100.108"_ip,
@@ -92,8 +92,8 @@ TEST_F(UdhcpcTest, WhatAScriptIsGivenTellsTheLease) {
                                   .expires = 1'000'600,
                                   .obtained = 1'000'000,
                                   .origin = root_.path("/run/udhcpc.eth1.state")}));
-    EXPECT_FALSE(read({process("eth2")}).leases.at(0).clientAlive);
-    EXPECT_FALSE(read({process("eth1", true)}).leases.at(0).clientAlive);
+    EXPECT_FALSE(read({udhcpcProcess("eth2")}).leases.at(0).clientAlive);
+    EXPECT_FALSE(read({udhcpcProcess("eth1", true)}).leases.at(0).clientAlive);
 }
 
 TEST_F(UdhcpcTest, AnInfiniteLeaseNeverEnds) {
@@ -124,7 +124,7 @@ TEST_F(UdhcpcTest, TheFileTellsWhenTheLeaseCameAndItsOptions) {
         "ip=192.0.2.7\nlease=600\nobtained=2000000\n"
         "options='PATH broadcast dns interface lease opt53 opt58 opt256 optx router subnet dns "
         "'\n");
-    ClientProcess client = process("eth1");
+    ClientProcess client = udhcpcProcess("eth1");
     client.pid = 17;
     const Lease lease = read({client}).leases.at(0);
     EXPECT_EQ(lease.obtained, 2'000'000);
@@ -142,7 +142,7 @@ TEST_F(UdhcpcTest, AFileThatOthersMayWriteIsNotBelieved) {
     write("ip=192.0.2.7\nlease=600\n");
     ASSERT_EQ(::chmod(root_.path("").c_str(), 0755), 0);
     ASSERT_EQ(::chmod(root_.path("/run/udhcpc.eth1.state").c_str(), 0666), 0);
-    const ClientFacts facts = read({process("eth1")});
+    const ClientFacts facts = read({udhcpcProcess("eth1")});
     EXPECT_THAT(facts.leases, IsEmpty());
     ASSERT_EQ(facts.diagnostics.size(), 1U);
     EXPECT_EQ(facts.diagnostics[0].kind, Diagnostic::Kind::Untrusted);

@@ -18,7 +18,7 @@ using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
 
-constexpr const char* lease4 = R"(<?xml version="1.0"?>
+constexpr const char* wickedLease4 = R"(<?xml version="1.0"?>
 <!-- <state>released</state> -->
 <lease>
   <family>ipv4</family>
@@ -44,7 +44,7 @@ constexpr const char* lease4 = R"(<?xml version="1.0"?>
 </lease>
 )";
 
-constexpr const char* lease6 = R"(<lease>
+constexpr const char* wickedLease6 = R"(<lease>
   <family>ipv6</family>
   <type>dhcp</type>
   <state>granted</state>
@@ -71,38 +71,39 @@ std::string with(std::string text, const std::string& from, const std::string& t
     return text.replace(text.find(from), from.size(), to);
 }
 
-WickedLease parse(const std::string& xml) {
+WickedLease parsedWicked(const std::string& xml) {
     const auto parsed = parseWickedLease(xml);
     return std::get<WickedLease>(parsed);
 }
 
 TEST(WickedLease, OfIPv4) {
-    EXPECT_EQ(parse(lease4), (WickedLease{.family = AF_INET,
-                                          .type = "dhcp",
-                                          .state = "granted",
-                                          .server = "198.51.100.1"_ip,
-                                          .addresses = {{.address = "198.51.100.7"_ip,
-                                                         .acquired = 1'000'000,
-                                                         .lifetime = 600,
-                                                         .renewal = 300,
-                                                         .rebinding = 525}},
-                                          .clientIdentifier = "01:52:54:00:00:00:04"}));
+    EXPECT_EQ(parsedWicked(wickedLease4),
+              (WickedLease{.family = AF_INET,
+                           .type = "dhcp",
+                           .state = "granted",
+                           .server = "198.51.100.1"_ip,
+                           .addresses = {{.address = "198.51.100.7"_ip,
+                                          .acquired = 1'000'000,
+                                          .lifetime = 600,
+                                          .renewal = 300,
+                                          .rebinding = 525}},
+                           .clientIdentifier = "01:52:54:00:00:00:04"}));
 }
 
 TEST(WickedLease, OfIPv6NamesTheSenderOfTheServersMessages) {
-    EXPECT_EQ(parse(lease6), (WickedLease{.family = AF_INET6,
-                                          .type = "dhcp",
-                                          .state = "granted",
-                                          .server = "fe80::1"_ip,
-                                          .addresses = {{.address = "2001:db8::7"_ip,
-                                                         .acquired = 1'000'050,
-                                                         .lifetime = 600,
-                                                         .renewal = 200,
-                                                         .rebinding = 400}}}));
+    EXPECT_EQ(parsedWicked(wickedLease6), (WickedLease{.family = AF_INET6,
+                                                       .type = "dhcp",
+                                                       .state = "granted",
+                                                       .server = "fe80::1"_ip,
+                                                       .addresses = {{.address = "2001:db8::7"_ip,
+                                                                      .acquired = 1'000'050,
+                                                                      .lifetime = 600,
+                                                                      .renewal = 200,
+                                                                      .rebinding = 400}}}));
 }
 
 TEST(WickedLease, EveryBeginningIsTornOrEmpty) {
-    const std::string whole = lease4;
+    const std::string whole = wickedLease4;
     const std::size_t end = whole.rfind("</lease>") + 8;
     for (std::size_t size = 0; size < end; ++size) {
         const auto parsed = parseWickedLease(whole.substr(0, size));
@@ -113,8 +114,9 @@ TEST(WickedLease, EveryBeginningIsTornOrEmpty) {
 }
 
 TEST(WickedLease, OtherTextsGiveAReasonOrNothing) {
-    EXPECT_EQ(parse(""), (WickedLease{.type = "", .state = "", .server = {}, .addresses = {}}));
-    EXPECT_EQ(parse("text").addresses.size(), 0U);
+    EXPECT_EQ(parsedWicked(""),
+              (WickedLease{.type = "", .state = "", .server = {}, .addresses = {}}));
+    EXPECT_EQ(parsedWicked("text").addresses.size(), 0U);
     for (const char* text : {"<lease>", "<lease", "</lease>", "<a></b>", "<!-- <a>"}) {
         EXPECT_TRUE(std::holds_alternative<std::string_view>(parseWickedLease(text))) << text;
     }
@@ -137,7 +139,7 @@ class WickedTest : public testing::Test {
 };
 
 TEST_F(WickedTest, ALeaseIsTheFilesInterfacesOwn) {
-    root_.write(file, lease4);
+    root_.write(file, wickedLease4);
     Lease expected{.client = Client::Wicked,
                    .interfaceName = "eth1"_name,
                    .address = "198.51.100.7"_ip,
@@ -155,7 +157,7 @@ TEST_F(WickedTest, ALeaseIsTheFilesInterfacesOwn) {
 }
 
 TEST_F(WickedTest, BothPlacesAndProtocolsAreRead) {
-    root_.write("/run/wicked/lease-a-b-dhcp-ipv6.xml", lease6);
+    root_.write("/run/wicked/lease-a-b-dhcp-ipv6.xml", wickedLease6);
     EXPECT_THAT(read().leases,
                 ElementsAre(Lease{.client = Client::Wicked,
                                   .interfaceName = "a-b"_name,
@@ -170,28 +172,28 @@ TEST_F(WickedTest, BothPlacesAndProtocolsAreRead) {
 
 TEST_F(WickedTest, OnlyWhatIsGrantedByDhcpWithATimeIsALease) {
     for (const std::string& content :
-         {with(lease4, ">granted<", ">released<"), with(lease4, ">dhcp<", ">static<"),
-          with(lease4, "<lease-time>600</lease-time>", ""), with(lease4, ">ipv4<", ">ipx<"),
-          with(lease4, ">1000000<", ">soon<")}) {
+         {with(wickedLease4, ">granted<", ">released<"), with(wickedLease4, ">dhcp<", ">static<"),
+          with(wickedLease4, "<lease-time>600</lease-time>", ""),
+          with(wickedLease4, ">ipv4<", ">ipx<"), with(wickedLease4, ">1000000<", ">soon<")}) {
         root_.write(file, content);
         EXPECT_THAT(read().leases, IsEmpty()) << content;
     }
-    root_.write(file, with(lease4, ">600<", ">4294967295<"));
+    root_.write(file, with(wickedLease4, ">600<", ">4294967295<"));
     EXPECT_EQ(read().leases.at(0).expires, Lease::never);
 }
 
 TEST_F(WickedTest, ATornFileIsReportedAndOthersAreNotLookedAt) {
     root_.write(file, "<lease>");
-    root_.write("/var/lib/wicked/lease-eth1-auto-ipv6.xml", lease6);
-    root_.write("/var/lib/wicked/lease--dhcp-ipv4.xml", lease4);
-    root_.write("/var/lib/wicked/duid.xml", lease4);
+    root_.write("/var/lib/wicked/lease-eth1-auto-ipv6.xml", wickedLease6);
+    root_.write("/var/lib/wicked/lease--dhcp-ipv4.xml", wickedLease4);
+    root_.write("/var/lib/wicked/duid.xml", wickedLease4);
     EXPECT_THAT(read().leases, IsEmpty());
     EXPECT_THAT(ZR::Testing::textsOf(read().diagnostics),
                 ElementsAre(HasSubstr("the file ends within an element")));
 }
 
 TEST_F(WickedTest, AFileThatOthersCouldHaveWrittenIsNotBelieved) {
-    root_.write(file, lease4);
+    root_.write(file, wickedLease4);
     ZR::Testing::letOthersWrite(root_, "/var/lib/wicked/lease-eth1-dhcp-ipv4.xml");
     ZR::Testing::expectNoLeaseButADiagnostic(read());
 }

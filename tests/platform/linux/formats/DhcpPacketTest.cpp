@@ -42,7 +42,7 @@ std::string packet(const std::string& options, const std::string& file = "",
 std::string option(int code, const std::string& value) {
     return std::string{static_cast<char>(code)} + static_cast<char>(value.size()) + value;
 }
-const std::string end = "\xff";
+const std::string endOption = "\xff";
 const std::string server{"\xc0\x00\x02\x01", 4};
 const std::string tenMinutes{"\0\0\x02\x58", 4};
 
@@ -69,7 +69,8 @@ TEST(DhcpReply, CapturedByVersion10) {
 }
 
 TEST(DhcpReply, AServerMayRepeatWhoTheClientIs) {
-    const DhcpReply found = reply(packet(option(61, "\x01\x52\xff") + option(61, "\x0a") + end));
+    const DhcpReply found =
+        reply(packet(option(61, "\x01\x52\xff") + option(61, "\x0a") + endOption));
     EXPECT_EQ(found.clientIdentifier, "01:52:ff:0a");
     EXPECT_THAT(found.options, ElementsAre(61));
 }
@@ -83,11 +84,11 @@ TEST(DhcpReply, EveryBeginningOfACapturedOneHasAReason) {
 
 TEST(DhcpReply, NothingButAReplyWithTheCookieCounts) {
     EXPECT_EQ(reason(""), "shorter than a DHCP message");
-    std::string request = packet(end);
+    std::string request = packet(endOption);
     request[0] = 1;
     EXPECT_EQ(reason(request), "not a reply of a server");
     for (std::size_t i = 236; i < 240; ++i) {
-        std::string bad = packet(end);
+        std::string bad = packet(endOption);
         bad[i] = 'x';
         EXPECT_EQ(reason(bad), "no DHCP magic cookie") << i;
     }
@@ -105,37 +106,40 @@ TEST(DhcpReply, WithoutAnEndItWasTorn) {
 }
 
 TEST(DhcpReply, WithoutAMessageTypeItIsBootp) {
-    EXPECT_EQ(reply(packet(end)),
+    EXPECT_EQ(reply(packet(endOption)),
               (DhcpReply{.address = "192.0.2.7"_ip, .server = {}, .bootp = true, .leaseTime = {}}));
-    EXPECT_THAT(reply(packet(end)).options, testing::IsEmpty());
+    EXPECT_THAT(reply(packet(endOption)).options, testing::IsEmpty());
 }
 
 TEST(DhcpReply, PaddingAndWhatFollowsTheEndDoNotCount) {
-    EXPECT_EQ(reply(packet(std::string(3, '\0') + option(53, "\5") + end + option(54, server))),
-              (DhcpReply{.address = "192.0.2.7"_ip,
-                         .server = {},
-                         .bootp = false,
-                         .leaseTime = {},
-                         .options = {53}}));
+    EXPECT_EQ(
+        reply(packet(std::string(3, '\0') + option(53, "\5") + endOption + option(54, server))),
+        (DhcpReply{.address = "192.0.2.7"_ip,
+                   .server = {},
+                   .bootp = false,
+                   .leaseTime = {},
+                   .options = {53}}));
 }
 
 TEST(DhcpReply, OptionsMayGoOnInTheFileAndServerNameFields) {
-    const std::string both = option(53, "\5") + option(52, "\3") + end;
-    EXPECT_EQ(reply(packet(both, option(54, server) + end, option(51, tenMinutes) + end)),
-              (DhcpReply{.address = "192.0.2.7"_ip,
-                         .server = "192.0.2.1"_ip,
-                         .bootp = false,
-                         .leaseTime = 600,
-                         .options = {53, 52, 54, 51}}));
-    const std::string fileOnly = option(53, "\5") + option(52, "\1") + end;
-    EXPECT_EQ(reply(packet(fileOnly, option(54, server) + end, option(51, tenMinutes))).leaseTime,
-              std::nullopt);
-    const std::string neither = option(53, "\5") + end;
-    EXPECT_EQ(reply(packet(neither, option(54, server) + end)).server, std::nullopt);
+    const std::string both = option(53, "\5") + option(52, "\3") + endOption;
+    EXPECT_EQ(
+        reply(packet(both, option(54, server) + endOption, option(51, tenMinutes) + endOption)),
+        (DhcpReply{.address = "192.0.2.7"_ip,
+                   .server = "192.0.2.1"_ip,
+                   .bootp = false,
+                   .leaseTime = 600,
+                   .options = {53, 52, 54, 51}}));
+    const std::string fileOnly = option(53, "\5") + option(52, "\1") + endOption;
+    EXPECT_EQ(
+        reply(packet(fileOnly, option(54, server) + endOption, option(51, tenMinutes))).leaseTime,
+        std::nullopt);
+    const std::string neither = option(53, "\5") + endOption;
+    EXPECT_EQ(reply(packet(neither, option(54, server) + endOption)).server, std::nullopt);
 }
 
 TEST(DhcpReply, AnOptionThatOverflowsItsFieldIsRefused) {
-    const std::string overload = option(52, "\2") + end;
+    const std::string overload = option(52, "\2") + endOption;
     EXPECT_EQ(reason(packet(overload, "", option(54, std::string(62, 'x')))), "none");
     std::string half(64, '\0');
     half[62] = '\x36';
@@ -145,19 +149,19 @@ TEST(DhcpReply, AnOptionThatOverflowsItsFieldIsRefused) {
 
 TEST(DhcpReply, PartsOfASplitOptionBelongTogether) {
     EXPECT_EQ(reply(packet(option(54, server.substr(0, 1)) + option(53, "\5") +
-                           option(54, server.substr(1)) + end))
+                           option(54, server.substr(1)) + endOption))
                   .server,
               "192.0.2.1"_ip);
 }
 
 TEST(DhcpReply, ValuesOfAnotherLengthAreNone) {
-    const DhcpReply found = reply(packet(option(54, "\1\2") + option(51, "\1") + end));
+    const DhcpReply found = reply(packet(option(54, "\1\2") + option(51, "\1") + endOption));
     EXPECT_EQ(found.server, std::nullopt);
     EXPECT_EQ(found.leaseTime, std::nullopt);
 }
 
 TEST(DhcpReply, WithoutAnAddressItGivesNone) {
-    std::string none = packet(end);
+    std::string none = packet(endOption);
     none.replace(16, 4, 4, '\0');
     EXPECT_EQ(reply(none).address, std::nullopt);
 }

@@ -16,8 +16,6 @@ using State = IpmiConversation::State;
 using testing::ElementsAre;
 using testing::IsEmpty;
 
-const Bytes leased{198, 51, 100, 77};
-
 class IpmiConversationTest : public testing::Test {
   protected:
     void begin(ScriptedProcessor processor) {

@@ -14,8 +14,7 @@ using namespace std::chrono_literals;
 using testing::ElementsAre;
 using testing::IsEmpty;
 
-const Bytes leased{198, 51, 100, 77};
-const ServiceProcessor known{.lan = LanChannel{1, std::uint8_t{2}, "198.51.100.77"_ip}};
+const ServiceProcessor knownProcessor{.lan = LanChannel{1, std::uint8_t{2}, "198.51.100.77"_ip}};
 
 class IpmiReaderTest : public testing::Test {
   protected:
@@ -48,7 +47,7 @@ TEST_F(IpmiReaderTest, TheProcessorIsThereAtOnceAndItsChannelLater) {
     EXPECT_EQ(read(), ServiceProcessor{});
     EXPECT_TRUE(reader_.changed());
     EXPECT_TRUE(reader_.changed()) << "until it was read";
-    EXPECT_EQ(read(), known);
+    EXPECT_EQ(read(), knownProcessor);
     EXPECT_FALSE(reader_.changed());
     EXPECT_FALSE(processor_.isOpen) << "nothing stays open in between";
 }
@@ -57,12 +56,12 @@ TEST_F(IpmiReaderTest, TellsWhetherResponsesAreAwaited) {
     EXPECT_FALSE(reader_.awaiting()) << "nothing was asked yet";
     EXPECT_EQ(read(), ServiceProcessor{});
     EXPECT_TRUE(reader_.awaiting());
-    EXPECT_EQ(settled(), known);
+    EXPECT_EQ(settled(), knownProcessor);
     EXPECT_FALSE(reader_.awaiting());
 }
 
 TEST_F(IpmiReaderTest, IsAskedAtMostOnceAMinute) {
-    EXPECT_EQ(settled(), known);
+    EXPECT_EQ(settled(), knownProcessor);
     const auto calls = processor_.asked.size();
     processor_.parameter(1, 3, {192, 0, 2, 7});
     const int received = processor_.received;
@@ -88,11 +87,11 @@ TEST_F(IpmiReaderTest, AMachineWithoutADeviceIsLookedAtOnceAMinuteToo) {
     EXPECT_EQ(processor_.opened, 2);
     processor_.openError = 0;
     EXPECT_TRUE(reader_.changed()) << "its driver was loaded";
-    EXPECT_EQ(settled(), known);
+    EXPECT_EQ(settled(), knownProcessor);
 }
 
 TEST_F(IpmiReaderTest, AnUnchangedResponseIsNotAChange) {
-    EXPECT_EQ(settled(), known);
+    EXPECT_EQ(settled(), knownProcessor);
     for (int i = 0; i < 5; ++i) {
         now_ += 1min;
         EXPECT_FALSE(reader_.changed());
@@ -104,23 +103,23 @@ TEST_F(IpmiReaderTest, AnUnchangedResponseIsNotAChange) {
 TEST_F(IpmiReaderTest, RareCallsTakeTheOldResponsesAndAskAnew) {
     EXPECT_EQ(read(), ServiceProcessor{});
     now_ += 1h;
-    EXPECT_EQ(read(), known);
+    EXPECT_EQ(read(), knownProcessor);
     EXPECT_EQ(processor_.opened, 2);
     processor_.parameter(1, 3, {192, 0, 2, 7});
     now_ += 1h;
-    EXPECT_EQ(read(), known) << "what was true an hour ago";
+    EXPECT_EQ(read(), knownProcessor) << "what was true an hour ago";
     now_ += 1h;
     EXPECT_EQ(read()->lan->address, "192.0.2.7"_ip);
 }
 
 TEST_F(IpmiReaderTest, SilenceLeavesWhatWasKnownUntilTheThirdTime) {
-    EXPECT_EQ(settled(), known);
+    EXPECT_EQ(settled(), knownProcessor);
     processor_.silent = true;
     for (int failure = 1; failure <= 2; ++failure) {
         now_ += 1min;
         static_cast<void>(reader_.changed());
         now_ += 2s;
-        EXPECT_EQ(read(), known) << failure;
+        EXPECT_EQ(read(), knownProcessor) << failure;
         EXPECT_THAT(ZR::Testing::textsOf(diagnostics_),
                     ElementsAre("service processor: no response within one second"));
     }
@@ -132,19 +131,19 @@ TEST_F(IpmiReaderTest, SilenceLeavesWhatWasKnownUntilTheThirdTime) {
     processor_.silent = false;
     now_ += 1min;
     static_cast<void>(reader_.changed());
-    EXPECT_EQ(settled(), known);
+    EXPECT_EQ(settled(), knownProcessor);
     EXPECT_THAT(ZR::Testing::textsOf(diagnostics_), IsEmpty());
 }
 
 TEST_F(IpmiReaderTest, OneResponseMakesUpForFailures) {
-    EXPECT_EQ(settled(), known);
+    EXPECT_EQ(settled(), knownProcessor);
     for (int i = 0; i < 5; ++i) {
         for (const bool silent : {true, true, false}) {
             processor_.silent = silent;
             now_ += 1min;
             static_cast<void>(reader_.changed());
             now_ += 2s;
-            EXPECT_EQ(read(), known);
+            EXPECT_EQ(read(), knownProcessor);
         }
     }
 }
@@ -180,11 +179,11 @@ TEST_F(IpmiReaderTest, ADeviceThatTakesNoRequestsIsAskedAgainNextMinute) {
     EXPECT_FALSE(reader_.changed());
     now_ += 1min;
     static_cast<void>(reader_.changed());
-    EXPECT_EQ(settled(), known);
+    EXPECT_EQ(settled(), knownProcessor);
 }
 
 TEST_F(IpmiReaderTest, ADeviceThatGoesTakesTheProcessorAlong) {
-    EXPECT_EQ(settled(), known);
+    EXPECT_EQ(settled(), knownProcessor);
     processor_.openError = ENOENT;
     now_ += 1min;
     EXPECT_TRUE(reader_.changed());

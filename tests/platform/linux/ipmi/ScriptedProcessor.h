@@ -13,6 +13,9 @@ namespace ZR::Live {
 
 using Bytes = std::vector<std::uint8_t>;
 
+/// The address that a processor was leased: 198.51.100.77.
+inline const Bytes leased{198, 51, 100, 77};
+
 /// A service processor as tests want it: it responds from a table, and what it was
 /// asked and how it is spoken to stays to be looked at. IpmiSimulatorTest.cpp goes
 /// the same way with a simulator that others made.

@@ -19,8 +19,6 @@ using NodeLexicon::Properties;
 using testing::ElementsAre;
 using testing::IsEmpty;
 
-const Bytes leased{198, 51, 100, 77};
-
 class ServiceProcessorMachineTest : public testing::Test {
   protected:
     /// A machine with one link, eth1, as often as it is read.

@@ -25,7 +25,7 @@ using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
 
-constexpr std::array<std::uint8_t, 4> own{198, 51, 100, 7};
+constexpr std::array<std::uint8_t, 4> ownAddress{198, 51, 100, 7};
 
 Step parts(const std::vector<Message>& messages) {
     return Step{messages};
@@ -42,7 +42,7 @@ std::vector<Step> someLinks() {
     return {parts({linkMessage(1, "lo"), linkMessage(2, "eth0"), done()})};
 }
 std::vector<Step> someAddresses() {
-    return {parts({addressMessage(2, own), done()})};
+    return {parts({addressMessage(2, ownAddress), done()})};
 }
 
 class RtnetlinkReaderTest : public testing::Test {
@@ -342,7 +342,7 @@ TEST_F(RtnetlinkReaderTest, AddressesOfALinkThatVanishedMeanwhileStay) {
     // Whoever joins the two leaves them out.
     const NetworkState state =
         read({someLinks(),
-              {parts({addressMessage(9, {192, 0, 2, 9}), addressMessage(2, own), done()})}});
+              {parts({addressMessage(9, {192, 0, 2, 9}), addressMessage(2, ownAddress), done()})}});
     EXPECT_THAT(names(state), ElementsAre("lo", "eth0"));
     EXPECT_EQ(state.addresses.size(), 2U);
     EXPECT_TRUE(state.certain);
