@@ -26,8 +26,10 @@ target_compile_options(zr_options INTERFACE
     $<$<BOOL:${ZR_WERROR}>:-Werror>)
 
 if(ZR_SANITIZERS)
+    # Each check is optimised, too, which takes longer than the tests gain by it; a fuzz
+    # target runs for long.
     add_compile_options(-fsanitize=${ZR_SANITIZERS} -fno-sanitize-recover=all
-                        -fno-omit-frame-pointer -O1 -g1)
+                        -fno-omit-frame-pointer -g1 $<IF:$<BOOL:${ZR_FUZZERS}>,-O1,-O0>)
     add_link_options(-fsanitize=${ZR_SANITIZERS})
     # The check of virtual tables looks at memory through a pipe, and reports a fault
     # when a test has taken all descriptors away.

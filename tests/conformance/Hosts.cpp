@@ -7,6 +7,7 @@
 #include "cimom/Results.h"
 #include "cimxml/OperationRequest.h"
 #include "cimxml/OperationResponse.h"
+#include "kit/Sanitizers.h"
 #include "kit/StrictHost.h"
 #include "kit/WireSupport.h"
 
@@ -249,7 +250,7 @@ class Server : public Host {
 
 std::vector<HostKind> hostKinds() {
     std::vector<HostKind> kinds;
-    for (const strict::NamedTraits& each : strict::namedTraits) {
+    for (const strict::NamedTraits& each : strict::testedTraits()) {
         // Only the whole schema has superclasses with defaults.
         const bool whole = each.traits.parentsDefaults || each.traits.filledModifications;
         kinds.push_back({each.name,
@@ -259,7 +260,10 @@ std::vector<HostKind> hostKinds() {
                          },
                          true});
     }
-    kinds.push_back({"EmbeddedManager", [] { return std::make_unique<EmbeddedManager>(); }});
+    // The server has an embedded object manager in it.
+    if (!ZR::Testing::sanitized) {
+        kinds.push_back({"EmbeddedManager", [] { return std::make_unique<EmbeddedManager>(); }});
+    }
     kinds.push_back({"Server", [] { return std::make_unique<Server>(); }});
     return kinds;
 }

@@ -39,8 +39,8 @@ inline std::ostream& operator<<(std::ostream& out, const HostKind& kind) {
     return out << kind.name;
 }
 
-/// The strict host with each of its traits, the embedded object manager, and its server
-/// over HTTP.
+/// The strict host with each of the traits that this build tests, the embedded object
+/// manager unless its server stands for it, too, and its server over HTTP.
 std::vector<HostKind> hostKinds();
 
 }  // namespace conformance

@@ -367,7 +367,7 @@ TEST_P(ProvidersInAStrictHostTest, KeysInLowerCaseNameTheSameInstance) {
 /// name, and leave properties unset that a superclass gives a default.
 std::vector<strict::NamedTraits> borneTraits() {
     std::vector<strict::NamedTraits> borne;
-    for (const strict::NamedTraits& each : strict::namedTraits) {
+    for (const strict::NamedTraits& each : strict::testedTraits()) {
         if (!each.traits.firstInstance && !each.traits.parentsDefaults) {
             borne.push_back(each);
         }

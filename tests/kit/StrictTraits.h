@@ -1,6 +1,9 @@
 #pragma once
 
 #include <array>
+#include <vector>
+
+#include "kit/Sanitizers.h"
 
 namespace strict {
 
@@ -28,18 +31,33 @@ struct Traits {
 struct NamedTraits {
     const char* name;
     Traits traits;
+    /// Whether providers are handed something else, and so run other code. The other
+    /// traits show in what is made of a provider's results, or in what none of them reads.
+    bool changesRequests = false;
 };
 
 /// A host without any of them, and one with each.
 inline constexpr std::array namedTraits{
-    NamedTraits{"Plain", {}},
-    NamedTraits{"DeclaredKeys", {.declaredKeys = true}},
+    NamedTraits{"Plain", {}, true},
+    NamedTraits{"DeclaredKeys", {.declaredKeys = true}, true},
     NamedTraits{"ParentsDefaults", {.parentsDefaults = true}},
-    NamedTraits{"FilledModifications", {.filledModifications = true}},
+    NamedTraits{"FilledModifications", {.filledModifications = true}, true},
     NamedTraits{"FirstInstance", {.firstInstance = true}},
     NamedTraits{"TellsItsVersion", {.tellsItsVersion = true}},
     NamedTraits{"LateBinding", {.lateBinding = true}},
     NamedTraits{"EmptyContexts", {.emptyContexts = true}},
 };
+
+/// Those that the tests of this build try. A sanitizer looks at the code that runs and not
+/// at what comes of it, and makes each test ten times as long: it is given each code once.
+inline std::vector<NamedTraits> testedTraits() {
+    std::vector<NamedTraits> tested;
+    for (const NamedTraits& each : namedTraits) {
+        if (each.changesRequests || !ZR::Testing::sanitized) {
+            tested.push_back(each);
+        }
+    }
+    return tested;
+}
 
 }  // namespace strict
