@@ -7,10 +7,10 @@
 #include <string>
 
 #include "kit/CallOrigin.h"
-#include "kit/FaultMachine.h"
 #include "kit/ProviderHost.h"
 #include "kit/Script.h"
 #include "kit/TemporaryDirectory.h"
+#include "kit/TreeMachine.h"
 
 namespace test {
 

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "kit/FaultMachine.h"
+#include "kit/TreeMachine.h"
 
 namespace test {
 

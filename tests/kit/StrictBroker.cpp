@@ -1,10 +1,9 @@
-#include "kit/StrictBroker.h"
+#include "kit/StrictObjects.h"
 
 #include <utility>
 
 #include "cimom/Names.h"
 #include "kit/StrictHost.h"
-#include "kit/StrictObjects.h"
 
 namespace strict {
 

@@ -9,7 +9,7 @@
 #include <utility>
 
 #include "cimom/Names.h"
-#include "kit/StrictBroker.h"
+#include "kit/StrictObjects.h"
 #include "kit/StrictValues.h"
 
 namespace strict {

@@ -153,4 +153,9 @@ void setStatus(CMPIStatus* status, CMPIrc code);
 /// Notes a violation when an argument is null.
 bool given(const void* argument, const char* function, const char* name);
 
+class StrictHost;
+
+/// The broker of a strict host: slots that are null in some object manager are null in it.
+CMPIBroker strictBroker(StrictHost& host, const Traits& traits);
+
 }  // namespace strict

@@ -1,27 +1,99 @@
-#include "NeighbourObjects.h"
-
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <unistd.h>
 
 #include <string>
 #include <vector>
 
+#include "MachineFacts.h"
+#include "NeighbourObjects.h"
+#include "cimom/ObjectManager.h"
+#include "cimom/ObjectPathText.h"
+#include "cimom/Results.h"
+#include "kit/ChildProcess.h"
+#include "kit/HostNameFake.h"
+#include "kit/PrivateNamespace.h"
 #include "kit/Tree.h"
 
 namespace {
 
+using ::testing::ElementsAre;
+using ::testing::HasSubstr;
+using ::testing::IsEmpty;
+using Numbers = std::vector<unsigned short>;
+using test::computer;
 using test::dhcpInterface;
 using test::host;
+using test::interface;
 using test::Json;
 using test::serviceProcessor;
 using test::staticInterface;
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
+using ZR::DHCPClientNeighbours::ComputerFacts;
+using ZR::DHCPClientNeighbours::InterfaceFacts;
 using ZR::DHCPClientNeighbours::isNeighbourClass;
 using ZR::DHCPClientNeighbours::NeighbourObject;
 using ZR::DHCPClientNeighbours::objectsOf;
+using ZR::DHCPClientNeighbours::readComputers;
+using ZR::DHCPClientNeighbours::readInterfaces;
 
-using Numbers = std::vector<unsigned short>;
+class MachineFactsTest : public test::TreeTest {};
+
+TEST_F(MachineFactsTest, EmptyMachineHasNeitherComputersNorInterfaces) {
+    EXPECT_EQ(readComputers(), std::vector<ComputerFacts>{});
+    EXPECT_EQ(readInterfaces(), std::vector<InterfaceFacts>{});
+}
+
+TEST_F(MachineFactsTest, ComputersAreToldInTheOrderOfTheTree) {
+    setTree({serviceProcessor({}), host({}), computer("Computer", "third", {})});
+    EXPECT_EQ(readComputers(), (std::vector<ComputerFacts>{
+                                   {"BMC:-1", true}, {hostName(), false}, {"third", false}}));
+}
+
+TEST_F(MachineFactsTest, OnlyTheExactDescriptionMakesAServiceProcessor) {
+    setTree({computer("bmc", "a", {}), computer("BMC ", "b", {}), computer("BMC", "c", {})});
+    EXPECT_EQ(readComputers(),
+              (std::vector<ComputerFacts>{{"a", false}, {"b", false}, {"c", true}}));
+}
+
+TEST_F(MachineFactsTest, ComputerWithoutAReadableNameIsLeftOut) {
+    setTree({{{"type", "ComputerSystem"}, {"description", "Computer"}}, host({})});
+    EXPECT_EQ(readComputers(), (std::vector<ComputerFacts>{{hostName(), false}}));
+}
+
+TEST_F(MachineFactsTest, InterfacesBelongToTheComputerTwoLevelsAbove) {
+    setTree({host({staticInterface("eth0")}), serviceProcessor({dhcpInterface("bmc0")})});
+    EXPECT_EQ(readInterfaces(), (std::vector<InterfaceFacts>{{"eth0", hostName(), false, "", 3},
+                                                             {"bmc0", "BMC:-1", true, "", 1}}));
+}
+
+TEST_F(MachineFactsTest, AddressAndItsSourceAreToldAsFarAsTheyCanBeRead) {
+    setTree({host({interface("all", {{"IPv4Address", "192.0.2.1"}, {"AddressSource", 4}}),
+                   interface("none"),
+                   interface("unreadable", {{"IPv4Address", 5}, {"AddressSource", "DHCP"}})})});
+    EXPECT_EQ(readInterfaces(),
+              (std::vector<InterfaceFacts>{{"all", hostName(), false, "192.0.2.1", 4},
+                                           {"none", hostName(), false, "", 0},
+                                           {"unreadable", hostName(), false, "", 0}}));
+}
+
+TEST_F(MachineFactsTest, InterfaceWithoutAReadableNameIsLeftOut) {
+    setTree({host(
+        {{{"type", "NetworkInterface"}, {"description", "nameless"}}, staticInterface("eth0")})});
+    EXPECT_EQ(readInterfaces(), (std::vector<InterfaceFacts>{{"eth0", hostName(), false, "", 3}}));
+}
+
+TEST_F(MachineFactsTest, MachineThatDoesNotTellItsNameIsLeftOutButNotItsInterfaces) {
+    setTree({host({staticInterface("eth0")}), serviceProcessor({dhcpInterface("bmc0")})});
+    const ZR::Testing::HostNameFails failing;
+    EXPECT_EQ(readComputers(), (std::vector<ComputerFacts>{{"BMC:-1", true}}));
+    EXPECT_EQ(readInterfaces(), (std::vector<InterfaceFacts>{{"eth0", "", false, "", 3},
+                                                             {"bmc0", "BMC:-1", true, "", 1}}));
+}
+
+TEST_F(MachineFactsTest, InterfaceWithNothingAboveIsTheHosts) {
+    setTree({interface("eth0")});
+    EXPECT_EQ(readInterfaces(), (std::vector<InterfaceFacts>{{"eth0", hostName(), false, "", 0}}));
+}
 
 constexpr unsigned short ipv4 = 4096;
 
@@ -152,6 +224,71 @@ TEST_F(NeighbourObjectsTest, ObjectsHaveTheKeysOfTheirClasses) {
         EXPECT_EQ(names, std::vector<std::string>(keys.begin(), keys.end())) << name;
     }
     EXPECT_TRUE(ZR::DHCPClientNeighbours::keysOf("CIM_ComputerSystem").empty());
+}
+
+// A machine without a name, behind an object manager with both provider libraries.
+
+cimom::Configuration bothProviders() {
+    cimom::Configuration result;
+    result.schemaDirectories = {ZR_SOURCE_DIR "/schema"};
+    result.registrationFiles = {ZR_SOURCE_DIR "/schema/exact/DHCPClientProvider.registration",
+                                ZR_SOURCE_DIR "/schema/exact/DHCPClientNeighbours.registration"};
+    result.providerDirectories = {ZR_BINARY_DIR "/lib/cmpi"};
+    return result;
+}
+
+class NamelessMachineTest : public test::TreeTest {
+  protected:
+    void SetUp() override {
+        TreeTest::SetUp();
+        if (!ZR::Testing::canEnterNamespaces()) {
+            GTEST_SKIP() << "needs a UTS name space of its own";
+        }
+        Json eth0 = dhcpInterface("eth0", {"192.0.2.1"});
+        eth0["properties"]["IPv4Address"] = "192.0.2.10";
+        setTree({host({eth0}), serviceProcessor({dhcpInterface("bmc0")})});
+    }
+
+    /// The names of a class' instances, one in a line, where the host name is empty.
+    static std::string namesOf(const std::string& className) {
+        const auto result = ZR::Testing::inChild([&className] {
+            ZR::Testing::enterNamespaces(CLONE_NEWUTS);
+            if (::sethostname("", 0) != 0) {
+                return std::string("the host name cannot be set");
+            }
+            cimom::ObjectManager manager{bothProviders()};
+            const auto found =
+                manager.enumerateInstanceNames(cimom::parseObjectPath("root/cimv2:" + className));
+            std::string text = "code " + std::to_string(found.status.code) + "\n";
+            for (const auto& path : found.paths) {
+                text += toText(path.value()) + "\n";
+            }
+            return text;
+        });
+        EXPECT_EQ(result.exitStatus, 0) << result.output;
+        return result.output;
+    }
+};
+
+TEST_F(NamelessMachineTest, ServesTheInterfacesOfItsHost) {
+    const std::string endpoints = namesOf("QVXZR_DHCPProtocolEndpoint");
+    EXPECT_THAT(endpoints, HasSubstr("code 0\n"));
+    EXPECT_THAT(endpoints, HasSubstr(R"(Name="eth0")"));
+    EXPECT_THAT(endpoints, HasSubstr(R"(Name="bmc0")"));
+    EXPECT_THAT(namesOf("QVXZR_DHCPRemoteServiceAccessPoint"), HasSubstr(R"(Name="eth0_IPv4")"));
+    EXPECT_THAT(namesOf("QVXZR_DHCPCapabilities"), HasSubstr("eth0"));
+    EXPECT_THAT(namesOf("QVXZR_DHCPSettingData"), HasSubstr(R"("Computer%eth0")"));
+}
+
+TEST_F(NamelessMachineTest, HasNeighboursButForTheComputerWithoutAName) {
+    EXPECT_EQ(namesOf("QVXZR_ComputerSystem"), "code 0\n");
+    EXPECT_THAT(namesOf("QVXZR_SPComputerSystem"), HasSubstr(R"(Name="BMC:-1")"));
+    EXPECT_EQ(namesOf("QVXZR_IPProtocolEndpoint"),
+              "code 0\nroot/cimv2:QVXZR_IPProtocolEndpoint."
+              R"(SystemCreationClassName="QVXZR_ComputerSystem",SystemName="",)"
+              R"(CreationClassName="QVXZR_IPProtocolEndpoint",Name="eth0")"
+              "\n");
+    EXPECT_THAT(namesOf("QVXZR_IPAssignmentSettingData"), HasSubstr(R"("Computer%eth0%dhcp")"));
 }
 
 }  // namespace

@@ -1,7 +1,9 @@
-#include "commands/Serve.h"
-
+// A server that is to serve until it is told to end.
 #include <gtest/gtest.h>
 
+#include "commands/Interruption.h"
+#include "commands/Serve.h"
+#include "kit/ChildProcess.h"
 #include "text/Failure.h"
 
 namespace cimdhcp {
@@ -21,4 +23,38 @@ TEST(Serve, RefusesWhatIsNoPlaceToListen) {
     }
 }
 
+}  // namespace cimdhcp
+
+namespace cimdhcp {
+namespace {
+
+TEST(Interruption, TheFirstSignalIsAWish) {
+    for (const int signal : {SIGINT, SIGTERM}) {
+        const Interruption interruption;
+        EXPECT_FALSE(interruption.wanted());
+        std::raise(signal);
+        EXPECT_TRUE(interruption.wanted());
+    }
+}
+
+TEST(Interruption, TheSecondSignalEndsTheProcess) {
+    const auto child = ZR::Testing::inChild([] {
+        const Interruption interruption;
+        std::raise(SIGINT);
+        std::raise(SIGINT);
+        return std::string("still here");
+    });
+    EXPECT_EQ(child.signal, SIGINT);
+}
+
+TEST(Interruption, SignalsAreAgainWhatTheyWere) {
+    const auto child = ZR::Testing::inChild([] {
+        { const Interruption interruption; }
+        std::raise(SIGTERM);
+        return std::string("still here");
+    });
+    EXPECT_EQ(child.signal, SIGTERM);
+}
+
+}  // namespace
 }  // namespace cimdhcp

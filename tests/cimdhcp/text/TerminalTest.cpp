@@ -1,11 +1,14 @@
-#include "text/Terminal.h"
-
+// What a terminal is shown beside the text.
 #include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/ioctl.h>
 
 #include <cstdlib>
+#include <sstream>
 
+#include "text/ProgressBar.h"
+#include "text/Style.h"
+#include "text/Terminal.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace cimdhcp {
@@ -53,6 +56,66 @@ TEST_F(Terminal, FollowsColumnsFirst) {
 TEST(TerminalWidth, IsNoneForAFile) {
     const ZR::UniqueFd file(::open("/dev/null", O_WRONLY));
     EXPECT_EQ(terminalWidth(file.get(), "60"), std::nullopt);
+}
+
+TEST(Color, IsForTerminalsUnlessSomebodySaysOtherwise) {
+    EXPECT_TRUE(wantsColor(ColorMode::automatic, true, nullptr, "xterm"));
+    EXPECT_TRUE(wantsColor(ColorMode::automatic, true, "", nullptr));
+    EXPECT_FALSE(wantsColor(ColorMode::automatic, false, nullptr, "xterm"));
+    EXPECT_FALSE(wantsColor(ColorMode::automatic, true, "1", "xterm"));
+    EXPECT_FALSE(wantsColor(ColorMode::automatic, true, nullptr, "dumb"));
+}
+
+TEST(Color, IsAsWantedOtherwise) {
+    EXPECT_TRUE(wantsColor(ColorMode::always, false, "1", "dumb"));
+    EXPECT_FALSE(wantsColor(ColorMode::never, true, nullptr, "xterm"));
+}
+
+TEST(Style, LeavesTextAsItIsWithoutColor) {
+    EXPECT_EQ(Style{}.strong("a"), "a");
+    EXPECT_EQ(Style{}.alarming("a"), "a");
+    const Style colored{true, true};
+    EXPECT_EQ(colored.strong("a"), "\x1B[1ma\x1B[0m");
+    EXPECT_EQ(colored.alarming("a"), "\x1B[31ma\x1B[0m");
+}
+
+TEST(ProgressText, ShowsHowFarItIs) {
+    EXPECT_EQ(progressText(0, 4, 0, 19), "[>         ] 0 of 4");
+    EXPECT_EQ(progressText(2, 4, 0, 19), "[=====>    ] 2 of 4");
+    EXPECT_EQ(progressText(4, 4, 0, 19), "[==========] 4 of 4");
+    EXPECT_EQ(progressText(2, 4, 1, 27), "[====>   ] 2 of 4, 1 failed");
+    EXPECT_EQ(progressText(1, 2, 0, 200).size(), 40U + 9U);
+}
+
+TEST(ProgressText, NeverIsWiderThanTheTerminal) {
+    for (std::size_t width = 0; width < 60; ++width) {
+        for (const std::size_t done : {0U, 7U, 12345U, 20000U}) {
+            EXPECT_LE(progressText(done, 12345, done / 2, width).size(), width);
+        }
+    }
+    EXPECT_EQ(progressText(0, 0, 0, 20), "[===========] 0 of 0");
+}
+
+TEST(ProgressBar, GoesAwayBeforeAnythingElseIsWritten) {
+    std::ostringstream out;
+    {
+        ProgressBar bar(out, 20, 2);
+        bar.hide();
+        EXPECT_EQ(out.str(), "");
+        bar.show(1, 0);
+        EXPECT_EQ(out.str(), "\r\x1B[K[=====>    ] 1 of 2");
+        bar.hide();
+        out << "x\n";
+        bar.show(2, 0);
+    }
+    EXPECT_EQ(out.str(),
+              "\r\x1B[K[=====>    ] 1 of 2\r\x1B[Kx\n\r\x1B[K[==========] 2 of 2\r\x1B[K");
+}
+
+TEST(ProgressBar, IsForTerminals) {
+    std::ostringstream out;
+    ProgressBar(out, std::nullopt, 2).show(1, 1);
+    EXPECT_EQ(out.str(), "");
 }
 
 }  // namespace

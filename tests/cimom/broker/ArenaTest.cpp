@@ -1,5 +1,4 @@
-#include "broker/Arena.h"
-
+// Where the objects of a request are, and until when.
 #include <gtest/gtest.h>
 #include <unistd.h>
 
@@ -7,11 +6,15 @@
 #include <cstdint>
 #include <cstring>
 #include <fstream>
+#include <thread>
 #include <vector>
 
+#include "broker/Arena.h"
+#include "broker/RequestScope.h"
 #include "kit/Sanitizers.h"
 
 using cimom::broker::Arena;
+using cimom::broker::RequestScope;
 
 TEST(Arena, BlocksAreAlignedAndDistinct) {
     Arena arena;
@@ -99,4 +102,54 @@ TEST(Arena, HasAnEnd) {
     EXPECT_THROW(arena.allocate(Arena::largest + 1), std::bad_alloc);
     arena.allocate(100);
     EXPECT_THROW(arena.allocate(Arena::largest - 50), std::bad_alloc);
+}
+
+TEST(RequestScope, InnermostScopeIsTheCurrentOne) {
+    const RequestScope outer;
+    EXPECT_EQ(&RequestScope::current(), &outer);
+    EXPECT_EQ(RequestScope::depthOfThread(), 1U);
+    {
+        const RequestScope inner;
+        EXPECT_EQ(&RequestScope::current(), &inner);
+        EXPECT_EQ(RequestScope::depthOfThread(), 2U);
+    }
+    EXPECT_EQ(&RequestScope::current(), &outer);
+}
+
+TEST(RequestScope, LevelsNestAndEndTogether) {
+    RequestScope scope;
+    Arena* const base = &scope.arena();
+    const void* const first = scope.mark();
+    EXPECT_NE(&scope.arena(), base);
+    const void* const second = scope.mark();
+    EXPECT_TRUE(scope.release(first));
+    EXPECT_EQ(&scope.arena(), base);
+    EXPECT_FALSE(scope.release(second));
+    EXPECT_FALSE(scope.release(nullptr));
+}
+
+TEST(RequestScope, ThreadWithoutRequestHasOneThatEndsWithTheThread) {
+    std::thread([] {
+        EXPECT_EQ(RequestScope::depthOfThread(), 0U);
+        RequestScope& own = RequestScope::current();
+        own.arena().allocate(100);
+        EXPECT_EQ(&RequestScope::current(), &own);
+    }).join();
+}
+
+TEST(RequestScope, AttachedThreadHasTheDepthOfItsRequest) {
+    std::thread([] {
+        EXPECT_FALSE(RequestScope::detachThread());
+        EXPECT_TRUE(RequestScope::attachThread(5));
+        EXPECT_FALSE(RequestScope::attachThread(5));
+        EXPECT_EQ(RequestScope::depthOfThread(), 5U);
+        {
+            const RequestScope request;
+            EXPECT_EQ(RequestScope::depthOfThread(), 6U);
+            EXPECT_FALSE(RequestScope::attachThread(1));
+            EXPECT_FALSE(RequestScope::detachThread());
+        }
+        EXPECT_TRUE(RequestScope::detachThread());
+        EXPECT_EQ(RequestScope::depthOfThread(), 0U);
+    }).join();
 }

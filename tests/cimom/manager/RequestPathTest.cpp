@@ -1,8 +1,11 @@
-#include "manager/RequestPath.h"
+#include <gtest/gtest.h>
 
 #include "cimom/ClassRepository.h"
 #include "cimom/Instance.h"
+#include "cimom/ObjectPathText.h"
 #include "kit/TestManager.h"
+#include "manager/PathMatch.h"
+#include "manager/RequestPath.h"
 
 namespace cimom {
 namespace {
@@ -71,6 +74,72 @@ TEST_F(RequestPath, ControlCharactersInTextsAreRefused) {
                   CMPI_RC_ERR_INVALID_PARAMETER);
     }
     EXPECT_EQ(check(Value::ofString("\n")).message, "property Name holds a control character");
+}
+
+Value number(Type type, Scalar scalar) {
+    return {type, false, std::move(scalar)};
+}
+
+Value referenceValue(const std::string& text) {
+    return {Type::reference, false,
+            Scalar(std::make_shared<const ObjectPath>(parseObjectPath(text)))};
+}
+
+class PathMatch : public testing::Test {
+  protected:
+    PathMatch() { repository.load(BROKER_TEST_DIR "/schema/Test.mof"); }
+
+    [[nodiscard]] bool same(const std::string& a, const std::string& b) const {
+        return sameObject(parseObjectPath(a), parseObjectPath(b), repository);
+    }
+    ClassRepository repository;
+};
+
+TEST_F(PathMatch, NumbersAgreeByValue) {
+    const Value five = number(Type::uint16, std::uint64_t{5});
+    EXPECT_TRUE(sameKeyValue(five, number(Type::sint64, std::int64_t{5})));
+    EXPECT_TRUE(sameKeyValue(five, number(Type::real64, 5.0)));
+    EXPECT_FALSE(sameKeyValue(five, number(Type::sint64, std::int64_t{-5})));
+    EXPECT_FALSE(sameKeyValue(number(Type::uint64, std::uint64_t{18446744073709551615U}),
+                              number(Type::sint64, std::int64_t{-1})));
+    EXPECT_FALSE(sameKeyValue(five, Value::ofString("5")));
+    EXPECT_FALSE(sameKeyValue(number(Type::boolean, true), number(Type::uint8, std::uint64_t{1})));
+}
+
+TEST_F(PathMatch, TextsAgreeExactly) {
+    EXPECT_TRUE(sameKeyValue(Value::ofString("a"), Value::ofString("a")));
+    EXPECT_FALSE(sameKeyValue(Value::ofString("a"), Value::ofString("A")));
+}
+
+TEST_F(PathMatch, NullAgreesWithNothing) {
+    const Value null = Value::null(Type::string, false);
+    EXPECT_FALSE(sameKeyValue(null, null));
+}
+
+TEST_F(PathMatch, ReferencesAgreeWithoutRegardToNamespaceLeftOutAndOrder) {
+    EXPECT_TRUE(sameKeyValue(referenceValue("a:C.X=1,Y=2"), referenceValue("c.y=2,x=1")));
+    EXPECT_FALSE(sameKeyValue(referenceValue("a:C.X=1"), referenceValue("b:C.X=1")));
+    EXPECT_FALSE(sameKeyValue(referenceValue("C.X=1"), referenceValue("C.X=1,Y=2")));
+}
+
+TEST_F(PathMatch, InstanceAgreesByPathOrProperty) {
+    const Instance instance{parseObjectPath("Test_Left.Id=\"1\""),
+                            {{"Number", number(Type::uint8, std::uint64_t{7})}}};
+    EXPECT_TRUE(hasKeys(instance, parseObjectPath("Test_Left.ID=\"1\"")));
+    EXPECT_TRUE(hasKeys(instance, parseObjectPath("Test_Left.Id=\"1\",number=7")));
+    EXPECT_TRUE(hasKeys(instance, parseObjectPath("Test_Left")));
+    EXPECT_FALSE(hasKeys(instance, parseObjectPath("Test_Left.Id=\"2\"")));
+    EXPECT_FALSE(hasKeys(instance, parseObjectPath("Test_Left.Id=\"1\",Other=7")));
+}
+
+TEST_F(PathMatch, SameObjectNeedsRelatedClassesAndOneSharedKey) {
+    EXPECT_TRUE(same("n:Test_Left.Id=\"1\"", "Test_Base.Id=\"1\",More=2"));
+    EXPECT_TRUE(same("N:Unknown.Id=\"1\"", "n:unknown.Id=\"1\""));
+    EXPECT_FALSE(same("Test_Left.Id=\"1\"", "Test_Right.Id=\"1\""));
+    EXPECT_FALSE(same("Test_Left.Id=\"1\"", "Test_Left.Id=\"2\""));
+    EXPECT_FALSE(same("Test_Left.Id=\"1\"", "Test_Left.Other=\"1\""));
+    EXPECT_FALSE(same("a:Test_Left.Id=\"1\"", "b:Test_Left.Id=\"1\""));
+    EXPECT_FALSE(same("Test_Left", "Test_Left"));
 }
 
 }  // namespace

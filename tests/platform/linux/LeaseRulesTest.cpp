@@ -1,11 +1,19 @@
-#include "LeaseRules.h"
-
+// Which lease holds, whose word is taken first, and who reads it.
 #include <gtest/gtest.h>
 
+#include <map>
+#include <set>
+
+#include "LeaseRules.h"
 #include "LinuxSupport.h"
+#include "Precedence.h"
+#include "StateReaders.h"
+#include "clients/Processes.h"
 
 namespace ZR::Live {
 namespace {
+
+using NodeLexicon::Properties;
 
 constexpr std::int64_t year = std::int64_t{365} * 24 * 3600;
 
@@ -137,6 +145,66 @@ TEST(LeaseRules, WickedsAddressesAreItsOwnWhileItRuns) {
     EXPECT_EQ(standingOf(lease, Address::infinite), Standing::Foreign);
     lease.clientAlive = true;
     EXPECT_EQ(standingOf(lease, Address::infinite), Standing::Live);
+}
+
+TEST(Precedence, RowsOfAPropertyStandTogether) {
+    std::set<Properties> finished;
+    Properties last{};
+    for (const DecisionRow& row : precedence()) {
+        if (row.property != last) {
+            EXPECT_TRUE(finished.insert(row.property).second) << row.reason;
+            last = row.property;
+        }
+        EXPECT_FALSE(row.reason.empty());
+    }
+    EXPECT_EQ(finished, (std::set<Properties>{Properties::Name, Properties::NameMaxLength,
+                                              Properties::InterfaceState, Properties::IPv4Address,
+                                              Properties::DHCPEnabled, Properties::AddressSource,
+                                              Properties::DHCPServerAddresses}));
+}
+
+TEST(Precedence, TheLastRowOfEachPropertyFindsAValueForAnyInterface) {
+    const Link link{.ifindex = 1, .name = "e"_name, .kind = "", .slaveKind = "", .carrier = {}};
+    std::map<Properties, bool> found;
+    for (const DecisionRow& row : precedence()) {
+        InterfaceView view;
+        view.link = &link;
+        found[row.property] = row.find(view).has_value();
+    }
+    // An interface need not have an address; all else is always told.
+    EXPECT_FALSE(found.at(Properties::IPv4Address));
+    found.erase(Properties::IPv4Address);
+    for (const auto& [property, has] : found) {
+        EXPECT_TRUE(has) << static_cast<int>(property);
+    }
+}
+
+TEST(StateReaders, ProcessesAreReadFirst) {
+    ASSERT_FALSE(stateReaders().empty());
+    EXPECT_EQ(stateReaders().front().read, &readProcesses);
+}
+
+TEST(StateReaders, EachPlaceIsAnAbsoluteDirectoryAndStandsOnce) {
+    std::set<std::pair<std::string_view, std::string_view>> places;
+    for (const StateReader& reader : stateReaders()) {
+        for (const StatePlace& place : reader.places) {
+            EXPECT_TRUE(place.directory.starts_with('/')) << place.directory;
+            EXPECT_FALSE(place.directory.ends_with('/')) << place.directory;
+            EXPECT_TRUE(places.emplace(place.directory, place.namePrefix).second)
+                << place.directory;
+        }
+    }
+    EXPECT_FALSE(places.empty());
+}
+
+TEST(StateReaders, OnAnEmptyMachineTheyFindNothing) {
+    const TemporaryDirectory root;
+    std::filesystem::create_directories(root.path("/proc/thread-self/ns"));
+    ClientFacts facts;
+    for (const StateReader& reader : stateReaders()) {
+        reader.read({.files = root.path(), .proc = root.path("/proc")}, facts);
+    }
+    EXPECT_EQ(facts, ClientFacts{});
 }
 
 }  // namespace

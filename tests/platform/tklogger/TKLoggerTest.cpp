@@ -6,8 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "AllocationCount.h"
-#include "SlowPathCount.h"
+#include "CallCounts.h"
 #include "kit/LogCapture.h"
 
 namespace TKLog {

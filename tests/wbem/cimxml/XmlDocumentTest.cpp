@@ -1,6 +1,9 @@
-#include "cimxml/XmlDocument.h"
-
+#include <gmock/gmock.h>
 #include <gtest/gtest.h>
+
+#include "cimxml/XmlDocument.h"
+#include "cimxml/XmlText.h"
+#include "kit/ElementTable.h"
 
 namespace cimom::wbem {
 
@@ -71,4 +74,93 @@ TEST(XmlDocument, IsUtf8WhateverItSays) {
               "\xC3\xBC");
 }
 
+std::string text(std::string_view written) {
+    std::string out;
+    appendText(out, written);
+    return out;
+}
+
+std::string attribute(std::string_view written) {
+    std::string out;
+    appendAttributeText(out, written);
+    return out;
+}
+
+TEST(XmlText, EscapesMarkup) {
+    EXPECT_EQ(text("a & b < c > d \" e '"), "a &amp; b &lt; c &gt; d \" e '");
+    EXPECT_EQ(attribute("a & b < c > d \" e '"), "a &amp; b &lt; c &gt; d &quot; e '");
+}
+
+TEST(XmlText, KeepsLineEndsAsTheyAre) {
+    EXPECT_EQ(text("a\r\n\tb"), "a&#13;\n\tb");
+    EXPECT_EQ(attribute("a\r\n\tb"), "a&#13;&#10;&#9;b");
+}
+
+TEST(XmlText, ReplacesWhatXmlCannotHold) {
+    EXPECT_EQ(text(std::string_view("a\0b\x1F", 4)),
+              "a\xEF\xBF\xBD"
+              "b\xEF\xBF\xBD");
+    EXPECT_EQ(text("\xEF\xBF\xBE"), "\xEF\xBF\xBD");        // U+FFFE
+    EXPECT_EQ(text("\xED\xA0\x80"), text("\xFF\xFF\xFF"));  // a surrogate, no UTF-8
+    EXPECT_EQ(text("x\xC3"), "x\xEF\xBF\xBD");
+}
+
+TEST(XmlText, KeepsCharactersOfAllPlanes) {
+    const std::string all = "\x7F\xC2\x80ü€\xF0\x9F\x98\x80\xEF\xBF\xBD";
+    EXPECT_EQ(text(all), all);
+}
+
+TEST(XmlText, WritesAttributes) {
+    std::string out = "<A";
+    appendAttribute(out, "NAME", "<\"x\">");
+    EXPECT_EQ(out, "<A NAME=\"&lt;&quot;x&quot;&gt;\"");
+}
+
 }  // namespace cimom::wbem
+
+namespace cimom::test {
+
+using ::testing::ElementsAre;
+using ::testing::IsEmpty;
+
+// The table judges every response in the other tests: it must be able to refuse.
+
+std::vector<std::string> judge(const std::string& xml) {
+    return violations(wbem::readXml(xml, 64));
+}
+
+TEST(ElementTable, AcceptsWhatItShould) {
+    EXPECT_THAT(judge("<INSTANCE CLASSNAME='A'><PROPERTY NAME='n' TYPE='string'><VALUE>x</VALUE>"
+                      "</PROPERTY><PROPERTY.REFERENCE NAME='r'/></INSTANCE>"),
+                IsEmpty());
+    EXPECT_THAT(judge("<INSTANCENAME CLASSNAME='A'><KEYVALUE>1</KEYVALUE></INSTANCENAME>"),
+                IsEmpty());
+}
+
+TEST(ElementTable, RefusesUnknownElements) {
+    EXPECT_THAT(judge("<PROPERTY.OBJECT/>"), ElementsAre("element PROPERTY.OBJECT is unknown"));
+}
+
+TEST(ElementTable, RefusesMissingUnknownAndWrongAttributes) {
+    EXPECT_THAT(judge("<CLASSNAME/>"), ElementsAre("CLASSNAME has no NAME"));
+    EXPECT_THAT(judge("<CLASSNAME NAME='a' TYPE='b'/>"),
+                ElementsAre("CLASSNAME has an attribute TYPE"));
+    EXPECT_THAT(judge("<PROPERTY NAME='a' TYPE='reference'/>"),
+                ElementsAre("PROPERTY has TYPE=\"reference\""));
+}
+
+TEST(ElementTable, RefusesChildrenInAnotherOrderOrNumber) {
+    EXPECT_THAT(judge("<NAMESPACEPATH><LOCALNAMESPACEPATH><NAMESPACE NAME='a'/>"
+                      "</LOCALNAMESPACEPATH><HOST>h</HOST></NAMESPACEPATH>"),
+                ElementsAre("NAMESPACEPATH does not hold HOST LOCALNAMESPACEPATH"));
+    EXPECT_THAT(judge("<LOCALNAMESPACEPATH/>"),
+                ElementsAre("LOCALNAMESPACEPATH does not hold NAMESPACE+"));
+    EXPECT_THAT(judge("<PROPERTY NAME='a' TYPE='string'><VALUE/><VALUE/></PROPERTY>"),
+                ElementsAre("PROPERTY does not hold QUALIFIER* VALUE?"));
+}
+
+TEST(ElementTable, RefusesTextBetweenElements) {
+    EXPECT_THAT(judge("<VALUE.ARRAY>x</VALUE.ARRAY>"), ElementsAre("VALUE.ARRAY holds text"));
+}
+
+}  // namespace cimom::test

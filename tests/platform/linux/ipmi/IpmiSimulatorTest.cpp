@@ -9,7 +9,6 @@
 #include <thread>
 
 #include "LinuxSupport.h"
-#include "RmcpSession.h"
 #include "Simulator.h"
 #include "ipmi/IpmiReader.h"
 #include "kit/Diagnostics.h"

@@ -1,5 +1,3 @@
-#include "kernel/ChangeMonitor.h"
-
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <net/if.h>
@@ -14,6 +12,8 @@
 #include <functional>
 
 #include "LinuxSupport.h"
+#include "kernel/ChangeMonitor.h"
+#include "kernel/WatchedPlace.h"
 #include "kit/Diagnostics.h"
 #include "kit/Namespaces.h"
 
@@ -439,6 +439,13 @@ TEST(ChangeMonitorKernel, MoreNetworkEventsThanTheKernelKeepsCountAsAChange) {
         EXPECT_TRUE(monitor.changed());
         EXPECT_THAT(ZR::Testing::textsOf(diagnostics), IsEmpty());
     }));
+}
+
+TEST(WatchedPlaces, AShorterPrefixCoversALongerOne) {
+    const WatchedPlace place{.directory = "/d", .namePrefix = "a"};
+    EXPECT_TRUE(place.covers({.directory = "/d", .namePrefix = "ab"}));
+    EXPECT_FALSE(place.covers({.directory = "/d", .namePrefix = ""}));
+    EXPECT_FALSE(place.covers({.directory = "/e", .namePrefix = "a"}));
 }
 
 }  // namespace
