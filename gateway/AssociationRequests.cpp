@@ -7,7 +7,7 @@
 
 #include "Links.h"
 #include "Lookup.h"
-#include "Refusal.h"
+#include "providerutilities/Refusal.h"
 #include "zrcommon/Strings.h"
 
 namespace ZR::DHCPClientGateway {

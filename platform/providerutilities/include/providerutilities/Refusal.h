@@ -5,7 +5,7 @@
 #include <stdexcept>
 #include <string>
 
-namespace ZR::DHCPClientGateway {
+namespace ZR {
 
 /// Ends a request with a status other than OK. The message is for the client.
 class Refusal : public std::runtime_error {
@@ -18,4 +18,4 @@ class Refusal : public std::runtime_error {
     CMPIrc code_;
 };
 
-}  // namespace ZR::DHCPClientGateway
+}  // namespace ZR
