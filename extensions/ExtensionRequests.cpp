@@ -10,33 +10,6 @@ namespace ZR::DHCPClientExtensions {
 
 namespace {
 
-[[noreturn]] void refuseKey(const char* className, const char* key, const char* what) {
-    throw Refusal(CMPI_RC_ERR_INVALID_PARAMETER,
-                  std::string("the key ") + key + " of " + className + ' ' + what);
-}
-
-/// Each key as a text, or with `references` as a reference, and no other ones.
-void requireKeys(const char* className, std::span<const char* const> names, bool references,
-                 const Keys& keys) {
-    for (const char* name : names) {
-        const Key* key = keys.find(name);
-        if (key == nullptr) {
-            refuseKey(className, name, "is missing");
-        }
-        if (references ? key->reference == nullptr : !key->isText) {
-            refuseKey(className, name, references ? "is not a reference" : "is not a text");
-        }
-    }
-    if (keys.size() != names.size()) {
-        throw Refusal(CMPI_RC_ERR_INVALID_PARAMETER,
-                      std::string("the path has a key that ") + className + " does not have");
-    }
-}
-
-[[noreturn]] void notFound(const char* className) {
-    throw Refusal(CMPI_RC_ERR_NOT_FOUND, std::string("there is no such instance of ") + className);
-}
-
 bool agree(const Keys& keys, const KeyTexts& texts) {
     return keys.size() == texts.size() &&
            std::all_of(texts.begin(), texts.end(), [&keys](const auto& text) {
@@ -99,28 +72,9 @@ void giveLink(const Request& request, const AssociationClass& association, const
     wanted.names ? give(request, path) : give(request, instance);
 }
 
-bool isGiven(const char* name) {
-    return name != nullptr && *name != '\0';
-}
-
-bool accepts(const char* wanted, const char* role) {
-    return !isGiven(wanted) || equalNames(wanted, role);
-}
-
-/// The tables know the superclasses, so that a host need not be sure of them; a host may
-/// know of more, where its schema is larger.
 template <typename Class>
-bool acceptsClass(const Request& request, const char* wanted, const Class& served) {
-    if (!isGiven(wanted) || equalNames(served.name, wanted) ||
-        std::any_of(served.ancestors.begin(), served.ancestors.end(),
-                    [wanted](const char* each) { return equalNames(each, wanted); })) {
-        return true;
-    }
-    CMPIStatus status{CMPI_RC_OK, nullptr};
-    const CMPIBoolean derived = request.broker->eft->classPathIsA(
-        request.broker, makePath(request.broker, request.nameSpace, {served.name, {}, {}}), wanted,
-        &status);
-    return status.rc == CMPI_RC_OK && derived != 0;
+bool acceptsServed(const Request& request, const char* wanted, const Class& served) {
+    return acceptsClass(request.broker, request.nameSpace, wanted, served.name, served.ancestors);
 }
 
 /// Whether the request's source is of a class that is at an end of an association. Throws
@@ -137,11 +91,11 @@ bool hasPlaces(const Request& request) {
         return false;
     }
     const Keys keys(request.path);
-    requireKeys(served->name, served->keys, false, keys);
+    requireKeys(served->name, served->keys, KeyKind::text, keys);
     const auto names = namesOf(*served, *request.machine);
     if (std::none_of(names.begin(), names.end(),
                      [&keys](const ObjectName& name) { return agree(keys, name.keys); })) {
-        notFound(served->name);
+        refuseMissing(served->name, keys);
     }
     return true;
 }
@@ -153,16 +107,16 @@ void forEachLink(const Request& request, const AssociationFilter& filter, const 
         return;
     }
     for (const AssociationClass& association : associationClasses()) {
-        if (!acceptsClass(request, filter.association, association)) {
+        if (!acceptsServed(request, filter.association, association)) {
             continue;
         }
         for (std::size_t near = 0; near < association.ends.size(); ++near) {
             const std::size_t far = 1 - near;
             if (!equalNames(association.ends.at(near), classNameOf(request.path)) ||
-                !accepts(filter.role, association.roles.at(near)) ||
-                !accepts(filter.resultRole, association.roles.at(far)) ||
-                !acceptsClass(request, filter.resultClass,
-                              *findElement(association.ends.at(far)))) {
+                !acceptsRole(filter.role, association.roles.at(near)) ||
+                !acceptsRole(filter.resultRole, association.roles.at(far)) ||
+                !acceptsServed(request, filter.resultClass,
+                               *findElement(association.ends.at(far)))) {
                 continue;
             }
             for (const Link& link : association.links(request)) {
@@ -228,7 +182,7 @@ void get(const Request& request, const Wanted& wanted) {
     const std::string name = classNameOf(request.path);
     const Keys keys(request.path);
     if (const AssociationClass* association = findAssociation(name)) {
-        requireKeys(association->name, association->roles, true, keys);
+        requireKeys(association->name, association->roles, KeyKind::reference, keys);
         for (const Link& link : association->links(request)) {
             const auto isEnd = [&](std::size_t end) {
                 return isNameOf(keys.find(association->roles.at(end))->reference, link.at(end),
@@ -239,20 +193,20 @@ void get(const Request& request, const Wanted& wanted) {
                 return;
             }
         }
-        notFound(association->name);
+        refuseMissing(association->name, keys);
     }
     const ElementClass* served = findElement(name);
     if (served == nullptr || served->objects == nullptr) {
         refuseClass(name);
     }
-    requireKeys(served->name, served->keys, false, keys);
+    requireKeys(served->name, served->keys, KeyKind::text, keys);
     for (const ExtensionObject& object : served->objects(*request.machine)) {
         if (object.id == keys.text("InstanceID")) {
             giveObject(request, object, wanted);
             return;
         }
     }
-    notFound(served->name);
+    refuseMissing(served->name, keys);
 }
 
 void associators(const Request& request, const AssociationFilter& filter, const Wanted& wanted) {

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "ExtensionClasses.h"
+#include "providerutilities/AssociationFilter.h"
 
 /// The requests. What is found goes to the request's result, which is not told that it is
 /// complete. All throw Refusal: with CMPI_RC_ERR_INVALID_CLASS for a class that this
@@ -16,15 +17,6 @@ struct Wanted {
 
 void enumerate(const Request& request, const Wanted& wanted);
 void get(const Request& request, const Wanted& wanted);
-
-/// What clients want to see; null or empty: anything. Classes may be those from which the
-/// wanted ones derive; names compare without regard to case.
-struct AssociationFilter {
-    const char* association = nullptr;
-    const char* resultClass = nullptr;
-    const char* role = nullptr;
-    const char* resultRole = nullptr;
-};
 
 /// The objects at the other ends. An object of a class that is at no end of an association
 /// has nothing associated.
