@@ -42,8 +42,8 @@ class Asker {
             RemoteClient client(server, settingsFor(server), Deadline(line_.options.timeout),
                                 line_.options.nameSpace);
             return carryOut(line_.command, client, presentation_);
-        } catch (const ConnectionError& error) {
-            throw Failure(ExitStatus::notLoaded, error.what());
+        } catch (const cimom::wbem::ConnectionError& error) {
+            throw failureOf(error);
         }
     }
 
@@ -57,7 +57,7 @@ class Asker {
                               "the password could be read on the way over http; use https, or "
                               "--insecure if no one can listen");
             }
-            settings.credential = *credential;
+            settings.credential = {credential->user, credential->password};
         }
         return settings;
     }
