@@ -129,6 +129,7 @@ class HttpConnection::Transfer {
     }
 
     [[nodiscard]] const HttpSettings& settings() const noexcept { return settings_; }
+    void extend(const Deadline& deadline) { deadline_ = deadline; }
 
   private:
     enum class Reason { none, memory, bodyTooLong, headersTooLong, interrupted };
@@ -265,7 +266,7 @@ class HttpConnection::Transfer {
 
     const HttpUrl url_;
     const HttpSettings settings_;
-    const Deadline deadline_;
+    Deadline deadline_;
     std::unique_ptr<CURL, FreeHandle> handle_;
     std::array<char, CURL_ERROR_SIZE> error_{};
     ReceivedResponse response_;
@@ -281,6 +282,10 @@ HttpConnection::~HttpConnection() = default;
 ReceivedResponse HttpConnection::post(const std::vector<std::string>& headers,
                                       const std::string& body) {
     return transfer_->post(headers, body);
+}
+
+void HttpConnection::extend(const Deadline& deadline) {
+    transfer_->extend(deadline);
 }
 
 const HttpSettings& HttpConnection::settings() const noexcept {

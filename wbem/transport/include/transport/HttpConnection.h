@@ -66,6 +66,9 @@ class HttpConnection {
     HttpConnection(const HttpConnection&) = delete;
     HttpConnection& operator=(const HttpConnection&) = delete;
 
+    /// Gives what follows the time until another deadline.
+    void extend(const Deadline& deadline);
+
     /// Headers as "NAME: VALUE", without line ends in them. Throws ConnectionError.
     ReceivedResponse post(const std::vector<std::string>& headers, const std::string& body);
 
