@@ -18,6 +18,8 @@ struct AssociationRequest;
 struct PathsResult;
 struct InstancesResult;
 class RequestHandler;
+class OwnClass;
+class Query;
 class ObjectManager;
 
 }  // namespace cimom
