@@ -47,7 +47,7 @@ ObjectManager::Implementation::Implementation(ObjectManager& manager, Configurat
         auto read = readRegistrations(file);
         std::move(read.begin(), read.end(), std::back_inserter(registrations_));
     }
-    providers_.emplace(configuration_.providerDirectories, repository_, &manager);
+    providers_.emplace(configuration_.providerDirectories, repository_, &manager, &filters_);
     served_.reserve(registrations_.size());
     for (const Registration& registration : registrations_) {
         serve(registration);
@@ -62,6 +62,10 @@ ObjectManager::Implementation::Implementation(ObjectManager& manager, Configurat
             }
         }
     }
+}
+
+ObjectManager::Implementation::~Implementation() {
+    filters_.close();
 }
 
 void ObjectManager::Implementation::serve(const Registration& registration) {
@@ -92,6 +96,9 @@ void ObjectManager::Implementation::serve(const Registration& registration) {
             }
         }
         served.nameSpaces.push_back(nameSpace);
+    }
+    if (registration.indication) {
+        filters_.serve(*declaration, *served.provider, served.nameSpaces);
     }
     served_.push_back(std::move(served));
     servedByName_[declaration->name].push_back(served_.size() - 1);
@@ -175,6 +182,10 @@ Result collected(Ask&& ask) {
 }
 
 }  // namespace
+
+IndicationHub& ObjectManager::indications() noexcept {
+    return implementation_->indications();
+}
 
 PathsResult ObjectManager::enumerateInstanceNames(const ObjectPath& path,
                                                   const InstanceRequest& request) {

@@ -47,6 +47,8 @@ class ObjectManager final : public RequestHandler {
     [[nodiscard]] const std::vector<std::string>& nameSpaces() const noexcept;
     /// The host of full paths.
     [[nodiscard]] const std::string& host() const noexcept;
+    /// Subscriptions to what providers tell by themselves.
+    [[nodiscard]] IndicationHub& indications() noexcept;
 
     RequestEnd enumerateInstanceNames(const ObjectPath& path, const InstanceRequest& request,
                                       ResultReceiver<ObjectPath>& receiver) override;
