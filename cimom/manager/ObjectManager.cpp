@@ -47,7 +47,7 @@ ObjectManager::Implementation::Implementation(ObjectManager& manager, Configurat
         auto read = readRegistrations(file);
         std::move(read.begin(), read.end(), std::back_inserter(registrations_));
     }
-    providers_.emplace(configuration_.providerDirectories, repository_, &manager);
+    providers_.emplace(configuration_.providerDirectories, repository_, &manager, &filters_);
     for (const Registration& registration : registrations_) {
         serve(registration);
     }
@@ -66,6 +66,10 @@ void ObjectManager::Implementation::orderAssociations() {
             }
         }
     }
+}
+
+ObjectManager::Implementation::~Implementation() {
+    filters_.close();
 }
 
 void ObjectManager::Implementation::serve(const Registration& registration) {
@@ -119,6 +123,9 @@ void ObjectManager::Implementation::serve(ServedClass served,
             }
         }
         served.nameSpaces.push_back(nameSpace);
+    }
+    if (registration.indication) {
+        filters_.serve(*declaration, *served.provider, served.nameSpaces);
     }
     served_.push_back(std::move(served));
     servedByName_[declaration->name].push_back(served_.size() - 1);
@@ -210,6 +217,10 @@ Result collected(Ask&& ask) {
 }
 
 }  // namespace
+
+IndicationHub& ObjectManager::indications() noexcept {
+    return implementation_->indications();
+}
 
 PathsResult ObjectManager::enumerateInstanceNames(const ObjectPath& path,
                                                   const InstanceRequest& request) {
