@@ -40,7 +40,7 @@ std::string excerpt(const std::string& text) {
     return printable(text.size() > shown ? text.substr(0, shown) + "..." : text);
 }
 
-void checkStatus(const HttpResponse& response, const HttpSettings& settings) {
+void checkStatus(const cimom::wbem::ReceivedResponse& response, const HttpSettings& settings) {
     if (response.status == http::ok) {
         return;
     }
@@ -144,6 +144,19 @@ std::vector<ClassEntry> leavesOf(const std::vector<ClassEntry>& classes) {
 
 }  // namespace
 
+Failure failureOf(const cimom::wbem::ConnectionError& error) {
+    using Kind = cimom::wbem::ConnectionError::Kind;
+    std::string message = printable(error.what());
+    if (error.kind == Kind::tooLate) {
+        message += "; --timeout gives it longer";
+    } else if (error.kind == Kind::notTrusted) {
+        message += "; --cacert FILE names who vouches for it";
+    } else if (error.kind == Kind::badCertificates) {
+        message += "; they are those of --cacert";
+    }
+    return {ExitStatus::notLoaded, message};
+}
+
 RemoteClient::RemoteClient(const ServerUrl& url, HttpSettings settings, const Deadline& deadline,
                            std::string nameSpace)
     : Client(std::move(nameSpace)), connection_(url, std::move(settings), deadline) {}
@@ -152,15 +165,15 @@ RemoteClient::~RemoteClient() = default;
 
 OperationResponse RemoteClient::ask(const OperationRequest& request) {
     try {
-        const HttpResponse response = connection_.post(
+        const cimom::wbem::ReceivedResponse response = connection_.post(
             {"Content-Type: application/xml; charset=\"utf-8\"",
              "Accept: application/xml, text/xml", "CIMOperation: MethodCall",
              "CIMMethod: " + request.method(), "CIMObject: " + request.objectHeader()},
             request.body());
         checkStatus(response, connection_.settings());
         return cimom::wbem::readResponse(response.body, request.method(), deepestXml);
-    } catch (const ConnectionError& error) {
-        fail(error.what());
+    } catch (const cimom::wbem::ConnectionError& error) {
+        throw failureOf(error);
     } catch (const cimom::wbem::XmlError& error) {
         fail("the response is not XML: " + excerpt(error.what()));
     } catch (const cimom::wbem::NotValid& error) {

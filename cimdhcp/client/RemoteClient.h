@@ -6,7 +6,8 @@
 #include <vector>
 
 #include "client/Client.h"
-#include "client/HttpConnection.h"
+#include "client/ServerUrl.h"
+#include "transport/HttpConnection.h"
 
 namespace cimom::wbem {
 class OperationRequest;
@@ -14,6 +15,12 @@ struct OperationResponse;
 }  // namespace cimom::wbem
 
 namespace cimdhcp {
+
+using cimom::wbem::Deadline;
+using cimom::wbem::HttpSettings;
+
+/// A server that could not be reached, with a remedy where there is one.
+[[nodiscard]] Failure failureOf(const cimom::wbem::ConnectionError& error);
 
 /// A WBEM server, reached with CIM-XML over HTTP (DSP0200, DSP0201). A server that cannot
 /// be reached, or whose response cannot be understood, is a Failure with
@@ -62,7 +69,7 @@ class RemoteClient : public Client {
     Response instancesOf(const cimom::wbem::OperationRequest& request);
     const cimom::ClassDeclaration* findClass(std::string_view className);
 
-    HttpConnection connection_;
+    cimom::wbem::HttpConnection connection_;
     /// By the name that was asked for; null: the server does not know the class.
     std::unordered_map<std::string, std::unique_ptr<const cimom::ClassDeclaration>> classes_;
 };

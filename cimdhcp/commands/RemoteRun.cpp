@@ -26,8 +26,8 @@ ExitStatus runRemotely(const CommandLine& line, const Presentation& presentation
         try {
             RemoteClient client = access.clientOf(server);
             return carryOut(line.command, client, presentation);
-        } catch (const ConnectionError& error) {
-            throw Failure(ExitStatus::notLoaded, error.what());
+        } catch (const cimom::wbem::ConnectionError& error) {
+            throw failureOf(error);
         }
     };
     if (!several) {

@@ -38,7 +38,7 @@ HttpSettings ServerAccess::settingsFor(const ServerUrl& server) const {
                           "the password could be read on the way over http; use https, or "
                           "--insecure if no one can listen");
         }
-        settings.credential = *credential;
+        settings.credential = {credential->user, credential->password};
     }
     return settings;
 }

@@ -47,7 +47,7 @@ ObjectManager::Implementation::Implementation(ObjectManager& manager, Configurat
         auto read = readRegistrations(file);
         std::move(read.begin(), read.end(), std::back_inserter(registrations_));
     }
-    providers_.emplace(configuration_.providerDirectories, repository_, &manager);
+    providers_.emplace(configuration_.providerDirectories, repository_, &manager, &filters_);
     for (const Registration& registration : registrations_) {
         serve(registration);
     }
@@ -68,6 +68,10 @@ void ObjectManager::Implementation::orderAssociations() {
     }
 }
 
+ObjectManager::Implementation::~Implementation() {
+    filters_.close();
+}
+
 void ObjectManager::Implementation::serve(const Registration& registration) {
     const std::string who =
         "class " + registration.className + " of provider " + registration.provider;
@@ -75,13 +79,12 @@ void ObjectManager::Implementation::serve(const Registration& registration) {
     if (declaration == nullptr) {
         throw LoadError(who + " is in none of the schema's files");
     }
-    serve({declaration,
-           &providers_->provider(registration.location, registration.provider),
-           nullptr,
-           registration.instance,
-           registration.association,
-           {}},
+    Provider& provider = providers_->provider(registration.location, registration.provider);
+    serve({declaration, &provider, nullptr, registration.instance, registration.association, {}},
           registration.nameSpaces, who);
+    if (registration.indication) {
+        filters_.serve(*declaration, provider, served_.back().nameSpaces);
+    }
 }
 
 void ObjectManager::Implementation::serve(std::unique_ptr<OwnClass> own) {
@@ -210,6 +213,10 @@ Result collected(Ask&& ask) {
 }
 
 }  // namespace
+
+IndicationHub& ObjectManager::indications() noexcept {
+    return implementation_->indications();
+}
 
 PathsResult ObjectManager::enumerateInstanceNames(const ObjectPath& path,
                                                   const InstanceRequest& request) {

@@ -15,6 +15,7 @@
 #include "cimom/ObjectManager.h"
 #include "cimom/OwnClass.h"
 #include "cimom/Results.h"
+#include "manager/ActiveFilters.h"
 #include "manager/ProviderCall.h"
 #include "manager/Providers.h"
 #include "manager/RequestedObjects.h"
@@ -36,6 +37,9 @@ struct ServedClass {
 class ObjectManager::Implementation {
   public:
     Implementation(ObjectManager& manager, Configuration configuration);
+    ~Implementation();
+    Implementation(const Implementation&) = delete;
+    Implementation& operator=(const Implementation&) = delete;
 
     [[nodiscard]] const ClassRepository& repository() const noexcept { return repository_; }
     [[nodiscard]] const std::vector<Registration>& registrations() const noexcept {
@@ -46,6 +50,8 @@ class ObjectManager::Implementation {
     }
     [[nodiscard]] const std::string& host() const noexcept { return configuration_.host; }
     void serve(std::unique_ptr<OwnClass> own);
+
+    [[nodiscard]] IndicationHub& indications() noexcept { return filters_; }
 
     RequestEnd enumerateInstanceNames(ObjectPath path, const InstanceRequest& request,
                                       ResultReceiver<ObjectPath>& receiver);
@@ -185,6 +191,7 @@ class ObjectManager::Implementation {
         servedByName_;
     ServedClasses associations_;  ///< all, in the order of the repository
     std::vector<std::string> nameSpaces_;
+    ActiveFilters filters_{{repository_, nameSpaces_, configuration_.host, configuration_.log}};
     /// Ends first: a provider that is being cleaned up may still ask.
     std::optional<Providers> providers_;
 };

@@ -37,9 +37,14 @@ const std::map<std::string, Rule>& table() {
                                          "TRANSLATABLE=true/false";
     static const std::map<std::string, Rule> all{
         {"CIM", {"CIMVERSION! DTDVERSION!", "MESSAGE"}},
-        {"MESSAGE", {"ID! PROTOCOLVERSION!", "(SIMPLEREQ/SIMPLERSP)"}},
+        {"MESSAGE", {"ID! PROTOCOLVERSION!", "(SIMPLEREQ/SIMPLERSP/SIMPLEEXPREQ/SIMPLEEXPRSP)"}},
         {"SIMPLEREQ", {"", "(IMETHODCALL/METHODCALL)"}},
         {"SIMPLERSP", {"", "(IMETHODRESPONSE/METHODRESPONSE)"}},
+        {"SIMPLEEXPREQ", {"", "EXPMETHODCALL"}},
+        {"SIMPLEEXPRSP", {"", "EXPMETHODRESPONSE"}},
+        {"EXPMETHODCALL", {"NAME!", "EXPPARAMVALUE*"}},
+        {"EXPMETHODRESPONSE", {"NAME!", "ERROR | IRETURNVALUE?"}},
+        {"EXPPARAMVALUE", {"NAME!", "INSTANCE?"}},
         {"IMETHODCALL", {"NAME!", "LOCALNAMESPACEPATH IPARAMVALUE*"}},
         {"IMETHODRESPONSE", {"NAME!", "ERROR | IRETURNVALUE? PARAMVALUE*"}},
         {"METHODRESPONSE", {"NAME!", "ERROR | RETURNVALUE? PARAMVALUE*"}},

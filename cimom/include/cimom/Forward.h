@@ -18,6 +18,7 @@ struct AssociationRequest;
 struct PathsResult;
 struct InstancesResult;
 class RequestHandler;
+class IndicationHub;
 class OwnClass;
 class Query;
 class ObjectManager;

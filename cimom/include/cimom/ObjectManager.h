@@ -57,6 +57,8 @@ class ObjectManager final : public RequestHandler {
     [[nodiscard]] const std::string* findNameSpace(const std::string& wanted) const;
     /// The host of full paths.
     [[nodiscard]] const std::string& host() const noexcept;
+    /// Subscriptions to what providers tell by themselves.
+    [[nodiscard]] IndicationHub& indications() noexcept;
 
     RequestEnd enumerateInstanceNames(const ObjectPath& path, const InstanceRequest& request,
                                       ResultReceiver<ObjectPath>& receiver) override;

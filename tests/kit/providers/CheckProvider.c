@@ -351,7 +351,7 @@ static void checkServices(const Call* call) {
                rc.rc == CMPI_RC_ERR_NOT_SUPPORTED && projection == NULL);
     report(call, "capabilities",
            (broker->bft->brokerCapabilities & CMPI_MB_BasicRead) == CMPI_MB_BasicRead &&
-               (broker->bft->brokerCapabilities & CMPI_MB_Indications) != CMPI_MB_Indications &&
+               (broker->bft->brokerCapabilities & CMPI_MB_Indications) == CMPI_MB_Indications &&
                broker->bft->brokerVersion == CMPIVersion200 && broker->bft->brokerName != NULL);
 }
 
@@ -523,7 +523,7 @@ static void checkUnsupported(const Call* call) {
           broker->bft->setProperty(broker, call->context, call->path, "p", NULL, CMPI_string).rc ==
               CMPI_RC_ERR_NOT_SUPPORTED;
     all = all && broker->bft->deliverIndication(broker, call->context, "n", NULL).rc ==
-                     CMPI_RC_ERR_NOT_SUPPORTED;
+                     CMPI_RC_ERR_INVALID_PARAMETER;
     report(call, "unsupported", all);
 }
 

@@ -1,4 +1,4 @@
-#include "client/HttpConnection.h"
+#include "transport/HttpConnection.h"
 
 #include <curl/curl.h>
 
@@ -8,9 +8,8 @@
 #include <new>
 
 #include "cimom/Names.h"
-#include "text/DisplayText.h"
 
-namespace cimdhcp {
+namespace cimom::wbem {
 
 namespace {
 
@@ -45,9 +44,9 @@ void append(Headers& list, const std::string& header) {
 
 }  // namespace
 
-const std::string* HttpResponse::header(std::string_view name) const noexcept {
+const std::string* ReceivedResponse::header(std::string_view name) const noexcept {
     const auto found = std::find_if(headers.begin(), headers.end(), [name](const auto& each) {
-        return cimom::sameName(each.first, name);
+        return sameName(each.first, name);
     });
     return found == headers.end() ? nullptr : &found->second;
 }
@@ -56,7 +55,7 @@ const std::string* HttpResponse::header(std::string_view name) const noexcept {
 /// exception may pass through: a reason to stop is kept until the transfer has returned.
 class HttpConnection::Transfer {
   public:
-    Transfer(ServerUrl url, HttpSettings settings, const Deadline& deadline)
+    Transfer(HttpUrl url, HttpSettings settings, const Deadline& deadline)
         : url_(std::move(url)), settings_(std::move(settings)), deadline_(deadline) {
         setUpLibrary();
         handle_.reset(curl_easy_init());
@@ -92,10 +91,10 @@ class HttpConnection::Transfer {
         }
     }
 
-    HttpResponse post(const std::vector<std::string>& headers, const std::string& body) {
+    ReceivedResponse post(const std::vector<std::string>& headers, const std::string& body) {
         const auto left = deadline_.left();
         if (left.count() == 0) {
-            throw ConnectionError(tooLate());
+            throw ConnectionError(tooLate(), ConnectionError::Kind::tooLate);
         }
         Headers list;
         for (const std::string& header : headers) {
@@ -119,7 +118,9 @@ class HttpConnection::Transfer {
             throw std::bad_alloc();
         }
         if (code != CURLE_OK) {
-            throw ConnectionError(reasonOf(code));
+            throw ConnectionError(reasonOf(code), reason_ == Reason::none
+                                                      ? kindOf(code)
+                                                      : ConnectionError::Kind::other);
         }
         long status = 0;
         curl_easy_getinfo(handle_.get(), CURLINFO_RESPONSE_CODE, &status);
@@ -128,6 +129,7 @@ class HttpConnection::Transfer {
     }
 
     [[nodiscard]] const HttpSettings& settings() const noexcept { return settings_; }
+    void extend(const Deadline& deadline) { deadline_ = deadline; }
 
   private:
     enum class Reason { none, memory, bodyTooLong, headersTooLong, interrupted };
@@ -198,17 +200,30 @@ class HttpConnection::Transfer {
         return "no response within " +
                std::to_string(
                    std::chrono::ceil<std::chrono::seconds>(deadline_.patience()).count()) +
-               " s; --timeout gives it longer";
+               " s";
     }
 
     [[nodiscard]] std::string detail(CURLcode code) const {
-        return printable(error_.front() == '\0' ? curl_easy_strerror(code) : error_.data());
+        return error_.front() == '\0' ? curl_easy_strerror(code) : error_.data();
     }
 
     [[nodiscard]] std::string systemError() const {
         long number = 0;
         curl_easy_getinfo(handle_.get(), CURLINFO_OS_ERRNO, &number);
         return number == 0 ? std::string() : std::strerror(static_cast<int>(number));
+    }
+
+    static ConnectionError::Kind kindOf(CURLcode code) noexcept {
+        switch (code) {
+            case CURLE_OPERATION_TIMEDOUT:
+                return ConnectionError::Kind::tooLate;
+            case CURLE_PEER_FAILED_VERIFICATION:
+                return ConnectionError::Kind::notTrusted;
+            case CURLE_SSL_CACERT_BADFILE:
+                return ConnectionError::Kind::badCertificates;
+            default:
+                return ConnectionError::Kind::other;
+        }
     }
 
     [[nodiscard]] std::string reasonOf(CURLcode code) const {
@@ -229,16 +244,15 @@ class HttpConnection::Transfer {
             case CURLE_OPERATION_TIMEDOUT:
                 return tooLate();
             case CURLE_COULDNT_RESOLVE_HOST:
-                return "there is no address for the name " + printable(url_.host);
+                return "there is no address for the name " + url_.host;
             case CURLE_COULDNT_CONNECT: {
                 const std::string error = systemError();
                 return "cannot be reached: " + (error.empty() ? detail(code) : error);
             }
             case CURLE_PEER_FAILED_VERIFICATION:
-                return "its certificate is not to be trusted (" + detail(code) +
-                       "); --cacert FILE names who vouches for it";
+                return "its certificate is not to be trusted (" + detail(code) + ')';
             case CURLE_SSL_CACERT_BADFILE:
-                return "the certificates of --cacert cannot be read (" + detail(code) + ')';
+                return "the certificates that vouch for it cannot be read (" + detail(code) + ')';
             case CURLE_SSL_CONNECT_ERROR:
                 return "it does not speak TLS, or none that is accepted (" + detail(code) + ')';
             case CURLE_GOT_NOTHING:
@@ -250,29 +264,32 @@ class HttpConnection::Transfer {
         }
     }
 
-    const ServerUrl url_;
+    const HttpUrl url_;
     const HttpSettings settings_;
-    const Deadline deadline_;
+    Deadline deadline_;
     std::unique_ptr<CURL, FreeHandle> handle_;
     std::array<char, CURL_ERROR_SIZE> error_{};
-    HttpResponse response_;
+    ReceivedResponse response_;
     std::size_t headerBytes_ = 0;
     Reason reason_ = Reason::none;
 };
 
-HttpConnection::HttpConnection(const ServerUrl& url, HttpSettings settings,
-                               const Deadline& deadline)
+HttpConnection::HttpConnection(const HttpUrl& url, HttpSettings settings, const Deadline& deadline)
     : transfer_(std::make_unique<Transfer>(url, std::move(settings), deadline)) {}
 
 HttpConnection::~HttpConnection() = default;
 
-HttpResponse HttpConnection::post(const std::vector<std::string>& headers,
-                                  const std::string& body) {
+ReceivedResponse HttpConnection::post(const std::vector<std::string>& headers,
+                                      const std::string& body) {
     return transfer_->post(headers, body);
+}
+
+void HttpConnection::extend(const Deadline& deadline) {
+    transfer_->extend(deadline);
 }
 
 const HttpSettings& HttpConnection::settings() const noexcept {
     return transfer_->settings();
 }
 
-}  // namespace cimdhcp
+}  // namespace cimom::wbem

@@ -1,17 +1,15 @@
-#include "http/ListeningSocket.h"
+#include "transport/ListeningSocket.h"
 
 #include <arpa/inet.h>
 #include <gtest/gtest.h>
 #include <netinet/in.h>
-
-#include "wbem/Server.h"
 
 namespace cimom::wbem {
 
 TEST(ListeningSocket, TakesAFreePortWhenAskedForNone) {
     const ListeningSocket socket("127.0.0.1", 0);
     EXPECT_GT(socket.port(), 0);
-    EXPECT_THROW(ListeningSocket("127.0.0.1", socket.port()), ServerError);
+    EXPECT_THROW(ListeningSocket("127.0.0.1", socket.port()), SocketError);
 }
 
 TEST(ListeningSocket, IsFreedAtItsEnd) {
@@ -24,7 +22,7 @@ TEST(ListeningSocket, IsFreedAtItsEnd) {
 }
 
 TEST(ListeningSocket, WantsANumericAddress) {
-    EXPECT_THROW(ListeningSocket("localhost", 0), ServerError);
+    EXPECT_THROW(ListeningSocket("localhost", 0), SocketError);
 }
 
 TEST(ListeningSocket, TellsAddressesOfClientsInNumbers) {

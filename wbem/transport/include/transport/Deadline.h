@@ -3,7 +3,7 @@
 #include <algorithm>
 #include <chrono>
 
-namespace cimdhcp {
+namespace cimom::wbem {
 
 /// A point in time, a while from its construction.
 class Deadline {
@@ -26,4 +26,4 @@ class Deadline {
     Clock::time_point end_;
 };
 
-}  // namespace cimdhcp
+}  // namespace cimom::wbem

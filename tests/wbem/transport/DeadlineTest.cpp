@@ -1,8 +1,8 @@
-#include "client/Deadline.h"
+#include "transport/Deadline.h"
 
 #include <gtest/gtest.h>
 
-namespace cimdhcp {
+namespace cimom::wbem {
 namespace {
 
 TEST(Deadline, LeavesNoMoreThanThePatienceAndNeverLessThanNothing) {
@@ -16,4 +16,4 @@ TEST(Deadline, LeavesNoMoreThanThePatienceAndNeverLessThanNothing) {
 }
 
 }  // namespace
-}  // namespace cimdhcp
+}  // namespace cimom::wbem

@@ -1,4 +1,4 @@
-#include "http/ListeningSocket.h"
+#include "transport/ListeningSocket.h"
 
 #include <arpa/inet.h>
 #include <netdb.h>
@@ -11,8 +11,6 @@
 #include <memory>
 #include <utility>
 
-#include "wbem/ServerSettings.h"
-
 namespace cimom::wbem {
 
 ListeningSocket::ListeningSocket(const std::string& address, std::uint16_t port) {
@@ -21,7 +19,7 @@ ListeningSocket::ListeningSocket(const std::string& address, std::uint16_t port)
     hints.ai_socktype = SOCK_STREAM;
     addrinfo* found = nullptr;
     if (::getaddrinfo(address.c_str(), std::to_string(port).c_str(), &hints, &found) != 0) {
-        throw ServerError("\"" + address + "\" is not an IPv4 or IPv6 address");
+        throw SocketError("\"" + address + "\" is not an IPv4 or IPv6 address");
     }
     const std::unique_ptr<addrinfo, void (*)(addrinfo*)> owned(found, ::freeaddrinfo);
     fd_ = ::socket(found->ai_family, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0);
@@ -34,7 +32,7 @@ ListeningSocket::ListeningSocket(const std::string& address, std::uint16_t port)
         ::bind(fd_, found->ai_addr, found->ai_addrlen) != 0 || ::listen(fd_, SOMAXCONN) != 0) {
         const int reason = errno;
         close();
-        throw ServerError(address + " port " + std::to_string(port) + ": " + std::strerror(reason));
+        throw SocketError(address + " port " + std::to_string(port) + ": " + std::strerror(reason));
     }
 }
 
@@ -46,7 +44,7 @@ std::uint16_t ListeningSocket::port() const {
     sockaddr_storage storage{};
     socklen_t length = sizeof storage;
     if (::getsockname(fd_, reinterpret_cast<sockaddr*>(&storage), &length) != 0) {
-        throw ServerError(std::strerror(errno));
+        throw SocketError(std::strerror(errno));
     }
     return ntohs(storage.ss_family == AF_INET
                      ? reinterpret_cast<const sockaddr_in*>(&storage)->sin_port
