@@ -56,6 +56,15 @@ struct Options {
 struct ShowCommand {
     bool operator==(const ShowCommand&) const = default;
 };
+struct WatchCommand {
+    std::vector<std::string> interfaces;       ///< names; none: all
+    std::optional<std::chrono::seconds> poll;  ///< look so often, without being told of changes
+
+    bool operator==(const WatchCommand&) const = default;
+};
+struct ProfilesCommand {
+    bool operator==(const ProfilesCommand&) const = default;
+};
 struct RenameCommand {
     std::string interfaceName;
     std::string name;
@@ -141,10 +150,10 @@ struct CheckCommand {
     bool operator==(const CheckCommand&) const = default;
 };
 
-using Command =
-    std::variant<ShowCommand, RenameCommand, GraphCommand, TreeCommand, ClassesCommand,
-                 NamesCommand, InstancesCommand, GetCommand, ModifyCommand, AssociatorsCommand,
-                 ReferencesCommand, ServeCommand, UserAddCommand, CheckCommand>;
+using Command = std::variant<ShowCommand, WatchCommand, RenameCommand, GraphCommand, TreeCommand,
+                             ClassesCommand, NamesCommand, InstancesCommand, GetCommand,
+                             ModifyCommand, AssociatorsCommand, ReferencesCommand, ServeCommand,
+                             UserAddCommand, CheckCommand, ProfilesCommand>;
 
 struct CommandLine {
     Options options;

@@ -150,6 +150,15 @@ void addOutputOptions(CLI::App& app, Options& options) {
         ->group(outputGroup);
 }
 
+void addWatchOptions(CLI::App& app, WatchCommand& watch) {
+    constexpr int longestPause = 86400;
+    app.add_option_function<unsigned>(
+           "--poll", [&watch](const unsigned& given) { watch.poll = std::chrono::seconds(given); },
+           "Look so often, where a server cannot tell of changes")
+        ->type_name("SECONDS")
+        ->check(CLI::Range(1, longestPause).description(""));
+}
+
 void addServeOptions(CLI::App& app, ServeCommand& serve) {
     app.add_option("--listen", serve.listen,
                    "Where to listen; 127.0.0.1 by default. Any address that other "

@@ -19,12 +19,12 @@ bool isOneOf(const Command& command) noexcept {
 /// Whether the result of the command is a list, which can be sorted and counted.
 bool givesList(const Command& command) noexcept {
     return asksClient(command) &&
-           !isOneOf<RenameCommand, GraphCommand, GetCommand, ModifyCommand>(command);
+           !isOneOf<WatchCommand, RenameCommand, GraphCommand, GetCommand, ModifyCommand>(command);
 }
 
 bool hasMofForm(const Command& command) noexcept {
-    return asksClient(command) &&
-           !isOneOf<ShowCommand, RenameCommand, GraphCommand, ClassesCommand>(command);
+    return asksClient(command) && !isOneOf<ShowCommand, WatchCommand, RenameCommand, GraphCommand,
+                                           ClassesCommand, ProfilesCommand>(command);
 }
 
 [[noreturn]] void refuse(const std::string& reason) {

@@ -13,6 +13,7 @@
 #include "commands/Graph.h"
 #include "commands/GraphDrawing.h"
 #include "commands/Overview.h"
+#include "commands/Profiles.h"
 #include "commands/Rename.h"
 #include "commands/ResponseOrder.h"
 #include "commands/ResponseText.h"
@@ -55,6 +56,15 @@ class Execution {
                 std::nullopt};
     }
 
+    Outcome operator()(const ProfilesCommand& /*command*/) const {
+        Profiles read = readProfiles(client_);
+        return {list(profileColumns(), std::move(read.profiles), profileTable,
+                     [&read](const std::vector<Profile>& profiles) {
+                         return profileJson(read.nameSpace, profiles);
+                     }),
+                "", std::nullopt};
+    }
+
     Outcome operator()(const RenameCommand& command) const {
         const RenameReport report = rename(command, client_);
         return {presentation_.json() ? renameJson(report) : renameText(report),
@@ -78,8 +88,8 @@ class Execution {
 
     template <typename Kind>
     Outcome operator()(const Kind& command) const {
-        if constexpr (isOneOf<Kind, TreeCommand, ServeCommand, UserAddCommand>) {
-            throw Failure(ExitStatus::usage, "this command is about this machine alone");
+        if constexpr (isOneOf<Kind, TreeCommand, ServeCommand, UserAddCommand, WatchCommand>) {
+            throw Failure(ExitStatus::usage, "this command does not ask one server once");
         } else {
             CimOperation operation = cimdhcp::carryOut(command, client_);
             if (presentation_.sort) {

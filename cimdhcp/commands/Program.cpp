@@ -19,6 +19,7 @@
 #include "commands/RemoteRun.h"
 #include "commands/Serve.h"
 #include "commands/UserAdd.h"
+#include "commands/Watch.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
 #include "text/Presentation.h"
@@ -79,6 +80,12 @@ class Execution {
         }
     }
 
+    void operator()(const WatchCommand& command) const {
+        tellOfTree();
+        const auto client = openClient(line_.options);
+        watchMachine(command, *client, presentation_, outputs_);
+    }
+
     void operator()(const UserAddCommand& command) const {
         addUser(command, outputs_.out, outputs_.err);
     }
@@ -116,11 +123,6 @@ class Execution {
     const Outputs& outputs_;
 };
 
-std::int64_t secondsNow() {
-    const auto now = std::chrono::system_clock::now().time_since_epoch();
-    return std::chrono::floor<std::chrono::seconds>(now).count();
-}
-
 Style styleFor(const Options& options, bool terminal) {
     return {!options.noHeader,
             wantsColor(options.color, terminal, std::getenv("NO_COLOR"), std::getenv("TERM"))};
@@ -142,6 +144,11 @@ Presentation presentationOf(const CommandLine& line, const Outputs& outputs) {
 
 ExitStatus runLine(const CommandLine& line, const Outputs& outputs, const Style& errorStyle) {
     const Presentation presentation = presentationOf(line, outputs);
+    const auto* const watch = std::get_if<WatchCommand>(&line.command);
+    if (line.options.remote() && watch != nullptr) {
+        watchServers(*watch, line.options, presentation, outputs);
+        return ExitStatus::ok;
+    }
     if (line.options.remote()) {
         return runRemotely(line, presentation, outputs, errorStyle);
     }
