@@ -93,7 +93,9 @@ _cimdhcp() {
             serve) options+=' --listen --tls-cert --tls-key --users --read-only --max-header-line
                 --max-headers --max-body --max-depth --max-connections --max-waiting --max-stuck
                 --max-result --max-enumerations --workers --io-threads --request-timeout --answer-timeout
-                --enumeration-timeout --max-enumeration-timeout' ;;
+                --enumeration-timeout --max-enumeration-timeout --subscriptions --listener-cacert
+                --max-filters --max-listeners --max-subscriptions --max-queue --delivery-retries
+                --retry-interval --listener-timeout --give-up-after' ;;
             user) options+=' --users --modify' ;;
             associators) options+=' --names --assoc-class --result-class --role --result-role' ;;
             references) options+=' --names --result-class --role' ;;

@@ -7,6 +7,7 @@
 #include <variant>
 #include <vector>
 
+#include "indications/SubscriptionSettings.h"
 #include "text/Presentation.h"
 #include "wbem/Limits.h"
 
@@ -133,6 +134,9 @@ struct ServeCommand {
     std::optional<std::string> users;
     bool readOnly = false;
     cimom::wbem::Limits limits;
+    std::optional<std::string> subscriptions;  ///< the directory where they are kept
+    cimom::wbem::DeliverySettings delivery;
+    cimom::wbem::SubscriptionLimits subscriptionLimits;
 
     bool operator==(const ServeCommand&) const = default;
 };

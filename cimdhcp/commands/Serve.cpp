@@ -1,5 +1,6 @@
 #include "commands/Serve.h"
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <charconv>
@@ -8,11 +9,16 @@
 #include <csignal>
 #include <cstdlib>
 #include <cstring>
+#include <filesystem>
+#include <memory>
 #include <mutex>
 #include <optional>
 #include <system_error>
 #include <thread>
+#include <utility>
 
+#include "cimom/ObjectManager.h"
+#include "indications/Subscriptions.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
 #include "tklogger/TKLogger.h"
@@ -61,6 +67,49 @@ void log(cimom::wbem::LogKind kind, const std::string& message) {
         "cimdhcp/Serve", "log", __LINE__, category,
         kind == cimom::wbem::LogKind::request ? ZR::LogLevel::flow : ZR::LogLevel::failure, nullptr,
         0, 0, message);
+}
+
+/// Where subscriptions are kept when the command line does not say it.
+std::filesystem::path standardDirectory() {
+    // As systemd says it to a service with StateDirectory=, of which the first counts.
+    const char* const given = std::getenv("STATE_DIRECTORY");
+    const std::string first =
+        given == nullptr ? "" : std::string(given).substr(0, std::string_view(given).find(':'));
+    return first.empty() ? "/var/lib/dhcp-client-provider/subscriptions" : first;
+}
+
+/// The subscriptions of clients. Without a directory that was asked for and can be used, they
+/// last as long as the server.
+std::unique_ptr<cimom::wbem::Subscriptions> subscriptionsOf(
+    const ServeCommand& command, const std::optional<std::vector<cimom::wbem::User>>& users,
+    cimom::ObjectManager& manager) {
+    cimom::wbem::SubscriptionSettings settings;
+    settings.directory =
+        command.subscriptions ? std::filesystem::path(*command.subscriptions) : standardDirectory();
+    settings.delivery = command.delivery;
+    settings.limits = command.subscriptionLimits;
+    if (command.delivery.caCertificates) {
+        static_cast<void>(pemText(*command.delivery.caCertificates));
+    }
+    if (users) {
+        settings.isUser = [users](const std::string& name) {
+            return std::any_of(users->begin(), users->end(),
+                               [&name](const auto& user) { return user.name == name; });
+        };
+    }
+    const auto tell = [](const std::string& line) { log(cimom::wbem::LogKind::failure, line); };
+    try {
+        return std::make_unique<cimom::wbem::Subscriptions>(manager, manager.indications(),
+                                                            settings, tell);
+    } catch (const std::system_error& error) {
+        if (command.subscriptions) {
+            throw Failure(ExitStatus::notLoaded, printable(error.what()));
+        }
+        tell(std::string("subscriptions end with the server: ") + error.what());
+    }
+    settings.directory.clear();
+    return std::make_unique<cimom::wbem::Subscriptions>(manager, manager.indications(), settings,
+                                                        tell);
 }
 
 /// The signals that end the server, as sigwait wants them: blocked in all threads,
@@ -150,7 +199,9 @@ void serve(const ServeCommand& command, cimom::ObjectManager& manager, std::ostr
         // Shorter than service managers wait before they kill.
         constexpr std::chrono::seconds patience(5);
         std::optional<EndInTime> end;
-        cimom::wbem::Server server(manager, settingsOf(command), log);
+        cimom::wbem::ServerSettings settings = settingsOf(command);
+        const auto subscriptions = subscriptionsOf(command, settings.users, manager);
+        cimom::wbem::Server server(manager, std::move(settings), log);
         log(cimom::wbem::LogKind::notice, "listening on " + server.url());
         out << "Listening on " << server.url() << std::endl;
         int signal = 0;

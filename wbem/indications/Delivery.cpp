@@ -116,14 +116,15 @@ void Delivery::deliverFirst(std::unique_lock<std::mutex>& lock) {
     }
     failures_ = tried_ == entry.id ? failures_ + 1 : 1;
     tried_ = entry.id;
-    if (result.outcome == Outcome::refused || failures_ > settings_.retries) {
+    const bool refused = result.outcome == Outcome::refused;
+    if (refused || failures_ > settings_.retries) {
         log_(who() + ": indication " + std::to_string(entry.number) + " lost, " + result.reason);
         queue_.pop();
-        return;
     }
-    wake_.wait_for(lock, settings_.retryInterval, [&] {
-        return stopping_ || queue_.front() == nullptr || queue_.front()->id != entry.id;
-    });
+    if (!refused) {
+        // The next one would fail, too: a listener that is away for a while loses few.
+        wake_.wait_for(lock, settings_.retryInterval, [this] { return stopping_.load(); });
+    }
 }
 
 Delivery::Attempt Delivery::attempt(const IndicationQueue::Entry& entry) {

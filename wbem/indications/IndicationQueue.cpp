@@ -190,6 +190,9 @@ void IndicationQueue::note(std::string_view line) {
 /// Puts what waits in a new file in the place of the old one, which is whole until then. An
 /// empty queue only empties its file.
 void IndicationQueue::writeAnew() {
+    if (file_.empty()) {
+        return;
+    }
     if (entries_.empty() && fd_ && ::ftruncate(fd_.get(), 0) == 0) {
         written_ = 0;
         return;

@@ -25,7 +25,7 @@ class IndicationQueue {
     using Log = std::function<void(const std::string& line)>;
     struct Bounds {
         std::size_t count = 1000;
-        std::size_t bytes = 16U << 20U;
+        std::size_t bytes = 4U << 20U;
     };
     struct Entry {
         std::uint64_t id = 0;  ///< within the file
@@ -34,7 +34,7 @@ class IndicationQueue {
     };
 
     /// Reads the file if there is one; one that cannot be read is kept as FILE.bad. A queue
-    /// whose file cannot be written works without it.
+    /// whose file cannot be written works without it, as does one without the name of a file.
     IndicationQueue(std::filesystem::path file, Bounds bounds, Log log);
 
     /// Adds an indication, for which the oldest ones may have to go, but not the first if it

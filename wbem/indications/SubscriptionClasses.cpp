@@ -490,7 +490,7 @@ class ServiceCapabilitiesClass final : public SubscriptionClass {
         add("MaxListenerDestinations",
             ofUnsigned(Type::uint16, std::min<std::uint64_t>(limits.listeners, most)));
         add("MaxActiveSubscriptions", ofUnsigned(Type::uint32, limits.subscriptions));
-        add("SubscriptionsPersisted", ofBoolean(true));
+        add("SubscriptionsPersisted", ofBoolean(!store().settings().directory.empty()));
         return {std::move(instance)};
     }
 };

@@ -1,14 +1,17 @@
 #include "SubscriptionStore.h"
 
+#include <fcntl.h>
+#include <sys/file.h>
+
 #include <algorithm>
 #include <array>
+#include <cerrno>
 #include <chrono>
 #include <cstdio>
 #include <random>
 #include <system_error>
 #include <utility>
 
-#include "cimom/ObjectManager.h"
 #include "cimom/OwnClass.h"
 #include "cimxml/ExportMessage.h"
 
@@ -79,20 +82,36 @@ std::string nameOf(const SubscriptionRecord& subscription) {
 
 }  // namespace
 
-SubscriptionStore::SubscriptionStore(ObjectManager& manager, SubscriptionSettings settings,
-                                     SubscriptionLog log)
-    : manager_(manager),
+SubscriptionStore::SubscriptionStore(IndicationHub& hub, std::string host,
+                                     SubscriptionSettings settings, SubscriptionLog log)
+    : hub_(hub),
+      host_(std::move(host)),
       settings_(std::move(settings)),
       log_(std::move(log)),
       serverStart_(startText()) {
-    std::filesystem::create_directories(settings_.directory);
-    std::filesystem::permissions(settings_.directory, std::filesystem::perms::owner_all);
-    load();
+    if (kept()) {
+        std::filesystem::create_directories(settings_.directory);
+        std::filesystem::permissions(settings_.directory, std::filesystem::perms::owner_all);
+        lockDirectory();
+        load();
+    }
     thread_ = std::thread([this] { maintain(); });
 }
 
 SubscriptionStore::~SubscriptionStore() {
     stop();
+}
+
+void SubscriptionStore::lockDirectory() {
+    const std::filesystem::path file = settings_.directory / "lock";
+    lock_.reset(::open(file.c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0600));
+    if (!lock_) {
+        throw std::system_error(errno, std::generic_category(), file.string());
+    }
+    if (::flock(lock_.get(), LOCK_EX | LOCK_NB) != 0) {
+        throw std::system_error(errno, std::generic_category(),
+                                settings_.directory.string() + " belongs to another server");
+    }
 }
 
 void SubscriptionStore::load() {
@@ -141,6 +160,7 @@ void SubscriptionStore::stop() {
         delivery->stop();
     }
     deliveries_.clear();
+    lock_.reset();
 }
 
 SubscriptionRecords SubscriptionStore::records() const {
@@ -150,7 +170,9 @@ SubscriptionRecords SubscriptionStore::records() const {
 
 void SubscriptionStore::replace(SubscriptionRecords records) {
     try {
-        writeRecords(settings_.directory / "subscriptions.json", records);
+        if (kept()) {
+            writeRecords(settings_.directory / "subscriptions.json", records);
+        }
     } catch (const std::system_error& error) {
         log_(error.what());
         refuse(CMPI_RC_ERR_FAILED, "the server cannot keep it");
@@ -344,7 +366,7 @@ Status SubscriptionStore::activate(const SubscriptionRecord& subscription,
     wanted.queryLanguage = filter->language;
     wanted.sourceNameSpaces = filter->sourceNameSpaces;
     wanted.owner = subscription.creator;
-    auto activation = manager_.indications().activate(
+    auto activation = hub_.activate(
         wanted, [delivery = deliveryTo(*destination), name = filter->name](const Indication& got) {
             delivery->add(indicationText(got.instance, name));
         });
@@ -377,10 +399,10 @@ std::shared_ptr<Delivery> SubscriptionStore::deliveryTo(const DestinationRecord&
     if (!delivery) {
         const std::string id = std::to_string(destination.id);
         delivery = std::make_shared<Delivery>(
-            Delivery::Listener{destination.name, readHttpUrl(destination.url),
-                               manager_.host() + '#' + serverStart_ + '#' + id + '-' +
-                                   std::to_string(destination.created),
-                               settings_.directory / ("queue-" + id)},
+            Delivery::Listener{
+                destination.name, readHttpUrl(destination.url),
+                host_ + '#' + serverStart_ + '#' + id + '-' + std::to_string(destination.created),
+                kept() ? settings_.directory / ("queue-" + id) : std::filesystem::path()},
             settings_.delivery, log_, [this, number = destination.id] {
                 {
                     const std::lock_guard lock(tasksMutex_);

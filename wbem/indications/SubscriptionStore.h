@@ -11,9 +11,9 @@
 
 #include "Delivery.h"
 #include "SubscriptionRecords.h"
-#include "cimom/Forward.h"
 #include "cimom/Indications.h"
 #include "indications/SubscriptionSettings.h"
+#include "zrcommon/UniqueFd.h"
 
 namespace cimom::wbem {
 
@@ -22,7 +22,9 @@ namespace cimom::wbem {
 /// concurrent use. Functions that change something throw RequestRefused.
 class SubscriptionStore {
   public:
-    SubscriptionStore(ObjectManager& manager, SubscriptionSettings settings, SubscriptionLog log);
+    /// Borrows the hub. `host` stands in the contexts of sequences.
+    SubscriptionStore(IndicationHub& hub, std::string host, SubscriptionSettings settings,
+                      SubscriptionLog log);
     ~SubscriptionStore();
     SubscriptionStore(const SubscriptionStore&) = delete;
     SubscriptionStore& operator=(const SubscriptionStore&) = delete;
@@ -57,6 +59,8 @@ class SubscriptionStore {
   private:
     using Key = std::pair<std::string, std::string>;  ///< filter and destination
 
+    [[nodiscard]] bool kept() const noexcept { return !settings_.directory.empty(); }
+    void lockDirectory();
     void load();
     /// Makes the records those, on disk and here. Throws RequestRefused; then nothing changes.
     void replace(SubscriptionRecords records);
@@ -77,7 +81,8 @@ class SubscriptionStore {
     void giveUp(std::uint64_t destinationId);
     [[nodiscard]] std::optional<Moment> nextEnd() const;
 
-    ObjectManager& manager_;
+    IndicationHub& hub_;
+    const std::string host_;
     const SubscriptionSettings settings_;
     const SubscriptionLog log_;
     const std::string serverStart_;  ///< in the contexts of sequences
@@ -88,6 +93,8 @@ class SubscriptionStore {
     mutable std::mutex recordsMutex_;
     SubscriptionRecords records_;
     bool stopped_ = false;
+
+    ZR::UniqueFd lock_;  ///< of the directory, which is this store's until it stops
 
     // Under changes_.
     std::map<Key, IndicationSubscription> active_;

@@ -9,9 +9,10 @@
 
 namespace cimom::wbem {
 
-Subscriptions::Subscriptions(ObjectManager& manager, SubscriptionSettings settings,
-                             SubscriptionLog log)
-    : store_(std::make_shared<SubscriptionStore>(manager, std::move(settings), std::move(log))) {
+Subscriptions::Subscriptions(ObjectManager& manager, IndicationHub& hub,
+                             SubscriptionSettings settings, SubscriptionLog log)
+    : store_(std::make_shared<SubscriptionStore>(hub, manager.host(), std::move(settings),
+                                                 std::move(log))) {
     for (auto& own : subscriptionClasses(store_, manager)) {
         manager.serve(std::move(own));
     }

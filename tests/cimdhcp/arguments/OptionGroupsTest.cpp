@@ -64,6 +64,32 @@ TEST(ServeOptions, EachLimitIsItsOwn) {
     EXPECT_EQ(read(arguments), serve);
 }
 
+TEST(ServeOptions, SayHowListenersAreServed) {
+    ServeCommand serve;
+    serve.subscriptions = "dir";
+    serve.delivery.caCertificates = "ca.pem";
+    serve.subscriptionLimits.filters = 1;
+    serve.subscriptionLimits.listeners = 2;
+    serve.subscriptionLimits.subscriptions = 3;
+    serve.delivery.queued = 4;
+    serve.delivery.retries = 0;
+    serve.delivery.retryInterval = std::chrono::seconds(5);
+    serve.delivery.patience = std::chrono::seconds(6);
+    serve.delivery.removalTime = std::chrono::seconds(7);
+    EXPECT_EQ(read({"--subscriptions",     "dir", "--listener-cacert", "ca.pem",
+                    "--max-filters",       "1",   "--max-listeners",   "2",
+                    "--max-subscriptions", "3",   "--max-queue",       "4",
+                    "--delivery-retries",  "0",   "--retry-interval",  "5",
+                    "--listener-timeout",  "6",   "--give-up-after",   "7"}),
+              serve);
+    for (const char* option :
+         {"--max-filters", "--max-listeners", "--max-subscriptions", "--max-queue",
+          "--retry-interval", "--listener-timeout", "--give-up-after"}) {
+        EXPECT_THROW(static_cast<void>(read({option, "0"})), CLI::ParseError) << option;
+        EXPECT_THROW(static_cast<void>(read({option, "-1"})), CLI::ParseError) << option;
+    }
+}
+
 TEST(ServeOptions, RefuseWhatIsNotANumber) {
     EXPECT_THROW(static_cast<void>(read({"--max-body", "much"})), CLI::ParseError);
     EXPECT_THROW(static_cast<void>(read({"--answer-timeout", "x"})), CLI::ParseError);

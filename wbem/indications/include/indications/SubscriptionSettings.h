@@ -16,7 +16,7 @@ struct DeliverySettings {
     std::chrono::milliseconds retryInterval{30000};
     std::chrono::milliseconds patience{10000};  ///< for a listener to respond
     std::size_t queued = 1000;                  ///< indications that wait for one listener
-    std::size_t queuedBytes = 16U << 20U;       ///< of their texts together
+    std::size_t queuedBytes = 4U << 20U;        ///< of their texts together
     /// How long a listener may fail without a success in between before it is given up.
     std::chrono::milliseconds removalTime{std::chrono::hours(24)};
     /// A PEM file of who vouches for listeners; none: the system's.
@@ -37,7 +37,7 @@ struct SubscriptionLimits {
 
 struct SubscriptionSettings {
     /// Where subscriptions and what waits for delivery are kept. It is made if need be, and
-    /// belongs to one server alone.
+    /// belongs to one server alone. Empty: they end with the server.
     std::filesystem::path directory;
     DeliverySettings delivery;
     SubscriptionLimits limits;

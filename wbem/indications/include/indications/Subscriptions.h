@@ -13,11 +13,12 @@ namespace cimom::wbem {
 class Subscriptions {
   public:
     /// Serves the classes from now on, and goes on with the subscriptions that are kept. To be
-    /// made before the manager carries requests out. Borrows the manager, which calls what
-    /// stays behind in its classes until it ends. A file of subscriptions that cannot be read
-    /// is told to the log and kept aside; throws std::system_error when the directory cannot
+    /// made before the manager carries requests out. Borrows manager and hub; what stays
+    /// behind in the classes of the manager does no harm. A file of subscriptions that cannot be
+    /// read is told to the log and kept aside; throws std::system_error when the directory cannot
     /// be used.
-    Subscriptions(ObjectManager& manager, SubscriptionSettings settings, SubscriptionLog log);
+    Subscriptions(ObjectManager& manager, IndicationHub& hub, SubscriptionSettings settings,
+                  SubscriptionLog log);
     /// Ends deliveries; what waits is kept for the next start. Requests about the classes are
     /// refused from then on.
     ~Subscriptions();
