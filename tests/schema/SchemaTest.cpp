@@ -458,8 +458,12 @@ TEST(Schema, RegisteredClassesAreTheElevenServedOnes) {
     std::set<std::string> served;
     const std::set<std::string> ends{"QVXZR_ComputerSystem", "QVXZR_SPComputerSystem",
                                      "QVXZR_IPProtocolEndpoint", "QVXZR_IPAssignmentSettingData"};
-    const std::set<std::string> extensions{"QVXZR_DHCPLease", "QVXZR_DHCPLeaseOfEndpoint",
-                                           "QVXZR_DHCPInterface", "QVXZR_DHCPDiagnostic"};
+    const std::set<std::string> extensions{"QVXZR_DHCPLease",
+                                           "QVXZR_DHCPLeaseOfEndpoint",
+                                           "QVXZR_DHCPInterface",
+                                           "QVXZR_DHCPDiagnostic",
+                                           "QVXZR_RegisteredDHCPClientProfile",
+                                           "QVXZR_DHCPClientConformsToProfile"};
     for (const ClassDeclaration* each : repository().classes()) {
         if (each->name.starts_with("QVXZR_") && !ends.contains(each->name) &&
             !extensions.contains(each->name)) {
