@@ -4,8 +4,8 @@
 #include <string>
 #include <unordered_map>
 
-#include "Refusal.h"
 #include "providerutilities/ProviderUtilities.h"
+#include "providerutilities/Refusal.h"
 
 namespace ZR::DHCPClientGateway {
 

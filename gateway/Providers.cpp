@@ -3,8 +3,8 @@
 #include <atomic>
 #include <utility>
 
-#include "Refusal.h"
 #include "providerutilities/ProviderUtilities.h"
+#include "providerutilities/Refusal.h"
 
 namespace ZR::DHCPClientGateway {
 

@@ -8,7 +8,7 @@
 
 #include "Classes.h"
 #include "Collector.h"
-#include "Keys.h"
+#include "providerutilities/Keys.h"
 
 namespace ZR::DHCPClientGateway {
 

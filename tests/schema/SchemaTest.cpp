@@ -208,7 +208,21 @@ INSTANTIATE_TEST_SUITE_P(
         Expected{"QVXZR_DHCPSettingData", "CIM_DHCPSettingData",
                  managedElement + ipSetting + dhcpSetting, 14, instanceId},
         Expected{"QVXZR_DHCPRemoteServiceAccessPoint", "CIM_RemoteServiceAccessPoint",
-                 element + accessPoint + remoteAccessPoint, 29, accessPointKeys}),
+                 element + accessPoint + remoteAccessPoint, 29, accessPointKeys},
+        Expected{"QVXZR_DHCPLease", "CIM_ManagedElement",
+                 managedElement +
+                     "InterfaceID:string Family:string ClientState:uint16 Address:string "
+                     "ServerAddress:string LeaseObtained:datetime RenewalTime:datetime "
+                     "RebindingTime:datetime LeaseExpires:datetime OptionsReceived:uint16[] "
+                     "ClientIdentifier:string ClientName:string Process:uint32 "
+                     "ClientRuns:boolean Source:string ",
+                 19, instanceId},
+        Expected{"QVXZR_DHCPInterface", "CIM_ManagedElement",
+                 managedElement +
+                     "DHCPEnabled:boolean LinkUp:boolean IPv4Address:string AddressOrigin:uint16 ",
+                 8, instanceId},
+        Expected{"QVXZR_DHCPDiagnostic", "CIM_ManagedElement", managedElement + "Kind:uint16 ", 5,
+                 instanceId}),
     [](const auto& test) { return test.param.name; });
 
 INSTANTIATE_TEST_SUITE_P(
@@ -256,6 +270,8 @@ INSTANTIATE_TEST_SUITE_P(
         Expected{"QVXZR_DHCPRemoteHostedAccessPoint", "CIM_HostedAccessPoint",
                  "Antecedent:CIM_ComputerSystem Dependent:QVXZR_DHCPRemoteServiceAccessPoint ", 2,
                  dependency},
+        Expected{"QVXZR_DHCPLeaseOfEndpoint", "CIM_Dependency",
+                 "Antecedent:QVXZR_DHCPProtocolEndpoint Dependent:QVXZR_DHCPLease ", 2, dependency},
         Expected{"QVXZR_SAPSAPDependency", "CIM_SAPSAPDependency",
                  "Antecedent:QVXZR_IPProtocolEndpoint Dependent:QVXZR_DHCPProtocolEndpoint ", 2,
                  dependency},
@@ -457,8 +473,15 @@ TEST(Schema, RegisteredClassesAreTheElevenServedOnes) {
     std::set<std::string> served;
     const std::set<std::string> ends{"QVXZR_ComputerSystem", "QVXZR_SPComputerSystem",
                                      "QVXZR_IPProtocolEndpoint", "QVXZR_IPAssignmentSettingData"};
+    const std::set<std::string> extensions{"QVXZR_DHCPLease",
+                                           "QVXZR_DHCPLeaseOfEndpoint",
+                                           "QVXZR_DHCPInterface",
+                                           "QVXZR_DHCPDiagnostic",
+                                           "QVXZR_RegisteredDHCPClientProfile",
+                                           "QVXZR_DHCPClientConformsToProfile"};
     for (const ClassDeclaration* each : repository().classes()) {
-        if (each->name.starts_with("QVXZR_") && !ends.contains(each->name)) {
+        if (each->name.starts_with("QVXZR_") && !ends.contains(each->name) &&
+            !extensions.contains(each->name)) {
             served.insert(each->name);
         }
     }

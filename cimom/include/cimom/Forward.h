@@ -19,6 +19,8 @@ struct PathsResult;
 struct InstancesResult;
 class RequestHandler;
 class IndicationHub;
+class OwnClass;
+class Query;
 class ObjectManager;
 
 }  // namespace cimom

@@ -1,11 +1,11 @@
-#include "Keys.h"
+#include "providerutilities/Keys.h"
 
 #include <algorithm>
 
 #include "providerutilities/ProviderUtilities.h"
 #include "zrcommon/Strings.h"
 
-namespace ZR::DHCPClientGateway {
+namespace ZR {
 
 namespace {
 
@@ -80,4 +80,4 @@ bool sameObject(const CMPIObjectPath* one, const CMPIObjectPath* other) {
     return (here.empty() || there.empty() || equalNames(here, there)) && Keys(one) == Keys(other);
 }
 
-}  // namespace ZR::DHCPClientGateway
+}  // namespace ZR

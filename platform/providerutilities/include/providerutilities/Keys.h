@@ -11,7 +11,7 @@
 /// What a path names, read without asking it for a key by name: some object managers count
 /// the keys that a class declares, and read out of bounds when one without a value is asked
 /// for.
-namespace ZR::DHCPClientGateway {
+namespace ZR {
 
 struct Key {
     std::string name;
@@ -54,4 +54,4 @@ class Keys {
 /// Whether two paths name the same object. A path that tells no namespace names one of any.
 [[nodiscard]] bool sameObject(const CMPIObjectPath* one, const CMPIObjectPath* other);
 
-}  // namespace ZR::DHCPClientGateway
+}  // namespace ZR
