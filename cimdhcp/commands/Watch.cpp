@@ -43,8 +43,9 @@ namespace {
 using Machines = std::set<std::size_t>;
 using std::chrono::milliseconds;
 
-// What happens at once is told by several indications: of the lease, of its endpoint.
-constexpr milliseconds settling{20};
+// What happens at once is told by several signs: a client sets the address first, and writes
+// its lease down when it is back from that.
+constexpr milliseconds settling{40};
 
 /// Rings when something has changed on machines. Any thread may ring it.
 class Bell {

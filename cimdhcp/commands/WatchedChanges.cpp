@@ -108,14 +108,20 @@ bool later(std::optional<std::int64_t> before, std::optional<std::int64_t> after
     return before && after && *after > *before + rounding;
 }
 
+/// What tells when a lease began may come some moments after the address.
 bool renewed(const WatchedState& before, const WatchedState& after) {
-    return later(before.obtained, after.obtained) ||
-           (!(before.obtained && after.obtained) && later(before.expires, after.expires));
+    return before.obtained ? later(before.obtained, after.obtained)
+                           : !after.obtained && later(before.expires, after.expires);
+}
+
+/// A server that was not known at first is told when it is.
+bool hasOtherServer(const WatchedState& before, const WatchedState& after) {
+    return !after.server.empty() && before.server != after.server;
 }
 
 bool differ(const WatchedState& before, const WatchedState& after) {
     return before.word != after.word || before.address != after.address ||
-           differ(before.server, after.server) || differ(before.client, after.client) ||
+           hasOtherServer(before, after) || differ(before.client, after.client) ||
            renewed(before, after);
 }
 
@@ -247,7 +253,7 @@ std::string changeText(const WatchedChange& change, std::string_view arrow) {
     if (differ(before.client, after.client)) {
         return with(text, "by ", before.client) + to + "by " + printable(after.client);
     }
-    if (differ(before.server, after.server)) {
+    if (hasOtherServer(before, after)) {
         return with(text, "from ", before.server) + to + "from " + printable(after.server);
     }
     return text + ", renewed" + untilText(after);

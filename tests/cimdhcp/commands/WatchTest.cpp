@@ -111,6 +111,8 @@ TEST(WatchedChanges, TakeNoRoundedTimeForARenewal) {
     EXPECT_THAT(changes({before}, {after}), IsEmpty());
     *after.leases->front().expires += 1;
     EXPECT_EQ(changes({before}, {after}).size(), 1U);
+    after.leases->front().obtained = now;
+    EXPECT_THAT(changes({before}, {after}), IsEmpty()) << "only now is it known";
 }
 
 TEST(WatchedChanges, TellOfAnotherServerAndOfAnotherClient) {
@@ -118,6 +120,10 @@ TEST(WatchedChanges, TellOfAnotherServerAndOfAnotherClient) {
     after.leases->front().server = "192.0.2.2";
     EXPECT_THAT(changes({bound("eth0", "192.0.2.17")}, {after}),
                 ElementsAre("eth0  bound 192.0.2.17 from 192.0.2.1 -> from 192.0.2.2"));
+    InterfaceOverview before = bound("eth0", "192.0.2.17");
+    before.leases->front().server.clear();
+    EXPECT_THAT(changes({before}, {after}),
+                ElementsAre("eth0  bound 192.0.2.17 -> from 192.0.2.2"));
     after.leases->front().client = "dhcpcd";
     EXPECT_THAT(changes({bound("eth0", "192.0.2.17")}, {after}),
                 ElementsAre("eth0  bound 192.0.2.17 by dhclient -> by dhcpcd"));
