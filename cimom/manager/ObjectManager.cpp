@@ -79,12 +79,11 @@ void ObjectManager::Implementation::serve(const Registration& registration) {
     if (declaration == nullptr) {
         throw LoadError(who + " is in none of the schema's files");
     }
-    serve({declaration,
-           &providers_->provider(registration.location, registration.provider),
-           nullptr,
-           registration.instance,
-           registration.association,
-           {}},
+    Provider& provider = providers_->provider(registration.location, registration.provider);
+    if (registration.indication) {
+        filters_.serve(*declaration, provider, registration.nameSpaces);
+    }
+    serve({declaration, &provider, nullptr, registration.instance, registration.association, {}},
           registration.nameSpaces, who);
 }
 
@@ -123,9 +122,6 @@ void ObjectManager::Implementation::serve(ServedClass served,
             }
         }
         served.nameSpaces.push_back(nameSpace);
-    }
-    if (registration.indication) {
-        filters_.serve(*declaration, *served.provider, served.nameSpaces);
     }
     served_.push_back(std::move(served));
     servedByName_[declaration->name].push_back(served_.size() - 1);
