@@ -4,6 +4,7 @@
 #include <utility>
 
 #include "MachineObjects.h"
+#include "ProfileObjects.h"
 #include "providerutilities/Classes.h"
 #include "zrcommon/Strings.h"
 
@@ -19,6 +20,9 @@ constexpr std::array endpointAncestors{"CIM_DHCPProtocolEndpoint", "CIM_Protocol
                                        "CIM_LogicalElement",       "CIM_ManagedSystemElement",
                                        "CIM_ManagedElement"};
 constexpr std::array dependencyAncestors{"CIM_Dependency"};
+constexpr std::array profileAncestors{"CIM_RegisteredProfile", "CIM_RegisteredSpecification",
+                                      "CIM_ManagedElement"};
+constexpr std::array conformsAncestors{"CIM_ElementConformsToProfile"};
 
 constexpr std::array elementKeys{"InstanceID"};
 constexpr std::array endpointKeys{"SystemCreationClassName", "SystemName", "CreationClassName",
@@ -26,10 +30,11 @@ constexpr std::array endpointKeys{"SystemCreationClassName", "SystemName", "Crea
 
 constexpr const char* endpoint = Classes::dhcpProtocolEndpoint.name;
 
-constexpr std::array<ElementClass, 4> elements{{
+constexpr std::array<ElementClass, 5> elements{{
     {"QVXZR_DHCPLease", elementAncestors, elementKeys, &leaseObjects},
     {"QVXZR_DHCPInterface", elementAncestors, elementKeys, &interfaceObjects},
     {"QVXZR_DHCPDiagnostic", elementAncestors, elementKeys, &diagnosticObjects},
+    {profileClass, profileAncestors, elementKeys, &profileObjects},
     {endpoint, endpointAncestors, endpointKeys, nullptr, &endpointNames},
 }};
 
@@ -41,12 +46,17 @@ std::vector<Link> leaseLinks(const Request& request) {
     return links;
 }
 
-constexpr std::array<AssociationClass, 1> associations{{
+constexpr std::array<AssociationClass, 2> associations{{
     {"QVXZR_DHCPLeaseOfEndpoint",
      dependencyAncestors,
      {"Antecedent", "Dependent"},
      {endpoint, "QVXZR_DHCPLease"},
      &leaseLinks},
+    {"QVXZR_DHCPClientConformsToProfile",
+     conformsAncestors,
+     {"ConformantStandard", "ManagedElement"},
+     {profileClass, endpoint},
+     &profileLinks},
 }};
 
 template <typename Class>

@@ -86,7 +86,7 @@ _cimdhcp() {
 
     if [[ $word == -* ]]; then
         case $command in
-            watch) options+=' --poll' ;;
+            watch) options+=' --poll --listen' ;;
             rename) options+=' --create --force' ;;
             graph) options+=' --svg' ;;
             tree) options+=' --explain' ;;

@@ -109,6 +109,11 @@ With --format json, each line is an object with "time", with several servers "ho
 "interface", "system", "family", "before" and "after"; the latter have "state", "address",
 "server", "client" and "expires", and are null for an interface that is not there.
 
+Servers tell of changes by indications: the watch leaves subscriptions in their interop
+namespace, for which its user needs the right to write, and listens on a free port of the
+address that a server is reached from. What it leaves is removed at its end; what a run left
+that was killed, by the next run of the same user.
+
 It ends with Ctrl-C or SIGTERM, and then with exit status 0. A server that does not respond
 is told on standard error, and asked again.)";
 

@@ -59,6 +59,7 @@ struct ShowCommand {
 struct WatchCommand {
     std::vector<std::string> interfaces;       ///< names; none: all
     std::optional<std::chrono::seconds> poll;  ///< look so often, without being told of changes
+    std::optional<std::string> listen;         ///< the address where servers tell of changes
 
     bool operator==(const WatchCommand&) const = default;
 };

@@ -157,6 +157,9 @@ void addWatchOptions(CLI::App& app, WatchCommand& watch) {
            "Look so often, where a server cannot tell of changes")
         ->type_name("SECONDS")
         ->check(CLI::Range(1, longestPause).description(""));
+    app.add_option("--listen", watch.listen,
+                   "Where servers tell of changes: an address of this machine")
+        ->type_name("ADDRESS");
 }
 
 void addServeOptions(CLI::App& app, ServeCommand& serve) {

@@ -76,6 +76,15 @@ void checkFormat(const CommandLine& line) {
     }
 }
 
+void checkWatch(const CommandLine& line) {
+    const auto* const watch = std::get_if<WatchCommand>(&line.command);
+    if (watch != nullptr && watch->listen && (watch->poll || !line.options.remote())) {
+        refuse(
+            "--listen is for servers that tell of changes: with --connect or --hosts, and "
+            "without --poll");
+    }
+}
+
 void checkLimits(const Command& command) {
     if (const auto* const serve = std::get_if<ServeCommand>(&command)) {
         try {
@@ -107,6 +116,7 @@ void completeCommandLine(CommandLine& line) {
         }
     }
     checkLimits(line.command);
+    checkWatch(line);
     checkServers(line);
     if ((options.sort || options.count) && !givesList(line.command)) {
         refuse("the result of this command is not a list: there is nothing to " +

@@ -249,6 +249,18 @@ Response RemoteClient::modify(const cimom::Instance& instance,
     return instancesOf(request);
 }
 
+Response RemoteClient::createInstance(const cimom::Instance& instance) {
+    OperationRequest request("CreateInstance", instance.path.nameSpace);
+    request.instance("NewInstance", instance);
+    return pathsOf(request);
+}
+
+Response RemoteClient::deleteInstance(const cimom::ObjectPath& path) {
+    OperationRequest request("DeleteInstance", path.nameSpace);
+    request.instanceName("InstanceName", path);
+    return pathsOf(request);
+}
+
 Response RemoteClient::associatorNames(const cimom::ObjectPath& path,
                                        const cimom::AssociationRequest& request) {
     return pathsOf(aboutAssociations("AssociatorNames", path, request));

@@ -49,6 +49,9 @@ class RemoteClient : public Client {
     Response get(const cimom::ObjectPath& path) override;
     Response modify(const cimom::Instance& instance,
                     const std::vector<std::string>& properties) override;
+    /// The response has the path of what was created.
+    Response createInstance(const cimom::Instance& instance);
+    Response deleteInstance(const cimom::ObjectPath& path);
     Response associatorNames(const cimom::ObjectPath& path,
                              const cimom::AssociationRequest& request) override;
     Response associators(const cimom::ObjectPath& path,

@@ -20,36 +20,8 @@ constexpr const char* profileClass = "CIM_RegisteredProfile";
 /// The class where the namespaces of a server are told: the same in all of them.
 constexpr const char* nameSpaceClass = "CIM_Namespace";
 
-/// Where servers have it, with what of them is common first.
-constexpr std::array interopNames{"interop", "root/interop", "root/PG_InterOp"};
-
-/// The interop namespace is the first one that exists; its own name is that of one of the
-/// namespaces that it tells of.
-std::string findInterop(Client& client) {
-    for (const char* name : interopNames) {
-        const cimom::ObjectPath path{"", name, nameSpaceClass, {}};
-        const Response response = client.enumerateNames(path);
-        if (response.status.code == CMPI_RC_ERR_INVALID_NAMESPACE) {
-            continue;
-        }
-        const bool classLacks = response.status.code == CMPI_RC_ERR_INVALID_CLASS ||
-                                response.status.code == CMPI_RC_ERR_NOT_FOUND ||
-                                response.status.code == CMPI_RC_ERR_NOT_SUPPORTED;
-        if (!response.status.ok() && !classLacks) {
-            throw client.failure(response, path);
-        }
-        for (const auto& each : response.paths) {
-            const std::string told = each ? heldText(each->key("Name")) : "";
-            if (cimom::sameName(told, name)) {
-                return told;
-            }
-        }
-        return name;
-    }
-    throw Failure(ExitStatus::notDone,
-                  "the server has no interop namespace: neither interop, root/interop nor "
-                  "root/PG_InterOp");
-}
+/// What servers call it.
+constexpr std::array interopNames{"root/interop", "interop", "root/PG_InterOp"};
 
 /// The number of instances that conform to a profile.
 std::optional<std::uint64_t> conforming(Client& client, const cimom::ObjectPath& profile) {
@@ -86,9 +58,35 @@ std::string organizationOf(const cimom::Instance& instance) {
 
 }  // namespace
 
+std::string interopNamespace(Client& client) {
+    for (const char* name : interopNames) {
+        const cimom::ObjectPath path{"", name, nameSpaceClass, {}};
+        const Response response = client.enumerateNames(path);
+        if (response.status.code == CMPI_RC_ERR_INVALID_NAMESPACE) {
+            continue;
+        }
+        const bool classLacks = response.status.code == CMPI_RC_ERR_INVALID_CLASS ||
+                                response.status.code == CMPI_RC_ERR_NOT_FOUND ||
+                                response.status.code == CMPI_RC_ERR_NOT_SUPPORTED;
+        if (!response.status.ok() && !classLacks) {
+            throw client.failure(response, path);
+        }
+        for (const auto& each : response.paths) {
+            const std::string told = each ? heldText(each->key("Name")) : "";
+            if (cimom::sameName(told, name)) {
+                return told;
+            }
+        }
+        return name;
+    }
+    throw Failure(ExitStatus::notDone,
+                  "the server has no interop namespace: neither interop, root/interop nor "
+                  "root/PG_InterOp");
+}
+
 Profiles readProfiles(Client& client) {
     Profiles profiles;
-    profiles.nameSpace = findInterop(client);
+    profiles.nameSpace = interopNamespace(client);
     const cimom::ObjectPath path{"", profiles.nameSpace, profileClass, {}};
     Response response = client.enumerate(path);
     if (!response.status.ok()) {

@@ -32,6 +32,10 @@ struct Profiles {
     bool operator==(const Profiles&) const = default;
 };
 
+/// The first of the usual names that is a namespace of the server, spelt as the server has it.
+/// Throws Failure when none is.
+[[nodiscard]] std::string interopNamespace(Client& client);
+
 /// Looks for the interop namespace, and in it for profiles. Throws Failure, also when there
 /// is no such namespace or the server knows of no profiles.
 [[nodiscard]] Profiles readProfiles(Client& client);

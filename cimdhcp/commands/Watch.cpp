@@ -4,7 +4,9 @@
 #include <sys/eventfd.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <array>
+#include <atomic>
 #include <cerrno>
 #include <chrono>
 #include <cstdint>
@@ -17,13 +19,17 @@
 #include <utility>
 #include <vector>
 
+#include "cimom/Indications.h"
+#include "cimom/ObjectManager.h"
 #include "client/EmbeddedClient.h"
 #include "client/MachineInterfaces.h"
+#include "client/StatusMessage.h"
 #include "commands/Fleet.h"
 #include "commands/Interruption.h"
 #include "commands/Overview.h"
 #include "commands/ServerAccess.h"
 #include "commands/WatchLog.h"
+#include "commands/WatchSubscriptions.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
 #include "text/Terminal.h"
@@ -104,21 +110,108 @@ WatchLog logFor(const WatchCommand& command, std::vector<std::string> machines, 
             outputs};
 }
 
+/// Lets the providers of this process tell of changes.
+cimom::IndicationSubscription subscribe(EmbeddedClient& client,
+                                        cimom::IndicationReceiver receiver) {
+    const cimom::IndicationFilter filter{.query = "SELECT * FROM CIM_InstIndication",
+                                         .sourceNameSpaces = {client.nameSpace()},
+                                         .owner = {}};
+    cimom::IndicationActivation activation =
+        client.manager().indications().activate(filter, std::move(receiver));
+    if (!activation.status.ok()) {
+        const std::string& words = activation.status.message;
+        throw Failure(ExitStatus::notLoaded, "no provider tells of changes (" +
+                                                 std::string(statusNameOf(activation.status)) +
+                                                 (words.empty() ? "" : ": " + printable(words)) +
+                                                 "); --poll SECONDS looks again and again");
+    }
+    return std::move(activation.subscription);
+}
+
+/// Asks servers at the same time, and hands over in this thread what comes of it.
+template <typename Result>
+void askAll(const std::vector<ServerUrl>& servers, const Machines& machines, std::size_t parallel,
+            const std::function<Result(std::size_t)>& ask, const std::atomic<bool>& interrupted,
+            const std::function<void(std::size_t, Result&&)>& arrived,
+            const std::function<void(std::size_t, const Failure&)>& failed) {
+    std::vector<ServerUrl> asked;
+    const std::vector<std::size_t> places(machines.begin(), machines.end());
+    for (const std::size_t machine : places) {
+        asked.push_back(servers[machine]);
+    }
+    std::vector<std::optional<Result>> results(asked.size());
+    const auto askOne = [&](const ServerUrl& server) {
+        const auto place = static_cast<std::size_t>(&server - asked.data());
+        try {
+            results[place] = ask(places[place]);
+        } catch (const cimom::wbem::ConnectionError& error) {
+            throw failureOf(error);
+        }
+        return Outcome();
+    };
+    askFleet(
+        asked, parallel, askOne,
+        [&](const ServerReport& report) {
+            const std::size_t machine = places[report.server];
+            if (report.outcome.failure) {
+                failed(machine, *report.outcome.failure);
+            } else if (results[report.server]) {
+                arrived(machine, *std::move(results[report.server]));
+            }
+        },
+        interrupted);
+}
+
 /// Looks at machines, writes what has changed, and waits, until the program is to end.
 class Watching {
   public:
     /// Looks at these machines and puts into the log what it has found.
     using Look = std::function<void(const Machines&)>;
 
-    Watching(WatchLog& log, Machines all, Look look, const Interruption& interruption)
-        : log_(log), all_(std::move(all)), look_(std::move(look)), interruption_(interruption) {}
-
-    [[nodiscard]] Bell& bell() noexcept { return bell_; }
+    Watching(WatchLog& log, Machines all, Look look, Bell& bell, const Interruption& interruption)
+        : log_(log),
+          all_(std::move(all)),
+          look_(std::move(look)),
+          bell_(bell),
+          interruption_(interruption) {}
 
     void begin() const {
         look_(all_);
         if (!interruption_.wanted()) {
             log_.announce();
+        }
+    }
+
+    /// Looks when the bell has rung, when leases end by time alone, and now and then at a
+    /// machine that did not respond.
+    void goOnWhenTold() {
+        constexpr std::chrono::seconds untilNextTry{30};
+        for (;;) {
+            Machines failed;
+            for (const std::size_t machine : all_) {
+                if (log_.hasFailed(machine)) {
+                    failed.insert(machine);
+                }
+            }
+            const std::int64_t now = secondsNow();
+            std::optional<milliseconds> time;
+            if (const auto next = log_.nextAge(now)) {
+                time = std::chrono::seconds(*next - now);
+            }
+            if (!failed.empty()) {
+                time = std::min(time.value_or(untilNextTry), milliseconds(untilNextTry));
+            }
+            Machines changed = bell_.wait(time, interruption_);
+            if (interruption_.wanted()) {
+                return;
+            }
+            if (changed.empty()) {
+                log_.age(secondsNow());
+                changed = std::move(failed);
+            }
+            if (!changed.empty()) {
+                look_(changed);
+            }
         }
     }
 
@@ -133,8 +226,8 @@ class Watching {
     WatchLog& log_;
     Machines all_;
     Look look_;
+    Bell& bell_;
     const Interruption& interruption_;
-    Bell bell_;
 };
 
 }  // namespace
@@ -142,11 +235,19 @@ class Watching {
 void watchMachine(const WatchCommand& command, EmbeddedClient& client,
                   const Presentation& presentation, const Outputs& outputs) {
     const Interruption interruption;
+    Bell bell;
     WatchLog log = logFor(command, {"this machine"}, false, presentation, outputs);
     const auto look = [&](const Machines& /*one*/) { log.saw(0, lookAt(client), secondsNow()); };
-    Watching watching(log, {0}, look, interruption);
+    Watching watching(log, {0}, look, bell, interruption);
+    if (command.poll) {
+        watching.begin();
+        watching.goOnByPolling(*command.poll);
+        return;
+    }
+    const cimom::IndicationSubscription subscription =
+        subscribe(client, [&bell](const cimom::Indication&) { bell.ring(0); });
     watching.begin();
-    watching.goOnByPolling(command.poll.value_or(std::chrono::seconds(1)));
+    watching.goOnWhenTold();
 }
 
 void watchServers(const WatchCommand& command, const Options& options,
@@ -155,6 +256,7 @@ void watchServers(const WatchCommand& command, const Options& options,
     const bool several = servers.size() > 1 || options.hosts;
     warnOfInsecurity(options, outputs.err);
     const Interruption interruption;
+    Bell bell;
     const ServerAccess access(options, interruption.wanted());
     std::vector<std::string> names;
     Machines all;
@@ -163,44 +265,74 @@ void watchServers(const WatchCommand& command, const Options& options,
         all.insert(all.size());
     }
     WatchLog log = logFor(command, std::move(names), several, presentation, outputs);
+    std::optional<WatchSubscriptions> subscriptions;
     bool begun = false;
-    const auto look = [&](const Machines& machines) {
-        std::vector<ServerUrl> asked;
-        std::vector<std::size_t> places;
-        for (const std::size_t machine : machines) {
-            asked.push_back(servers[machine]);
-            places.push_back(machine);
+    const auto ask = [&](std::size_t machine) {
+        RemoteClient client = access.clientOf(servers[machine]);
+        if (subscriptions) {
+            subscriptions->subscribe(machine, servers[machine], client);
         }
-        std::vector<std::vector<InterfaceOverview>> seen(asked.size());
-        const auto ask = [&](const ServerUrl& server) {
-            try {
-                RemoteClient client = access.clientOf(server);
-                seen[static_cast<std::size_t>(&server - asked.data())] = lookAt(client);
-                return Outcome();
-            } catch (const ConnectionError& error) {
-                throw Failure(ExitStatus::notLoaded, error.what());
-            }
-        };
-        const auto arrived = [&](const ServerReport& report) {
-            const std::size_t machine = places[report.server];
-            if (!report.outcome.failure) {
-                log.saw(machine, std::move(seen[report.server]), secondsNow());
-            } else if (interruption.wanted()) {
-                return;  // the user wants no more of it
-            } else if (!several && !begun) {
-                throw Failure(
-                    report.outcome.failure->status(),
-                    printable(servers[machine].given) + ": " + report.outcome.failure->what());
-            } else {
-                log.failed(machine, report.outcome.failure->what());
-            }
-        };
-        askFleet(asked, options.parallel, ask, arrived, interruption.wanted());
+        return lookAt(client);
     };
-    Watching watching(log, all, look, interruption);
-    watching.begin();
-    begun = true;
-    watching.goOnByPolling(command.poll.value_or(std::chrono::seconds(1)));
+    const auto failed = [&](std::size_t machine, const Failure& failure) {
+        if (interruption.wanted()) {
+            return;  // requests were broken off
+        }
+        if (!several && !begun) {
+            throw Failure(failure.status(),
+                          printable(servers[machine].given) + ": " + failure.what());
+        }
+        log.failed(machine, failure.what());
+    };
+    const auto look = [&](const Machines& machines) {
+        askAll<std::vector<InterfaceOverview>>(
+            servers, machines, options.parallel, ask, interruption.wanted(),
+            [&](std::size_t machine, std::vector<InterfaceOverview>&& interfaces) {
+                log.saw(machine, std::move(interfaces), secondsNow());
+            },
+            failed);
+    };
+    Watching watching(log, all, look, bell, interruption);
+    if (command.poll) {
+        watching.begin();
+        begun = true;
+        watching.goOnByPolling(*command.poll);
+        return;
+    }
+    subscriptions.emplace(command.listen, servers.size(),
+                          [&bell](std::size_t machine) { bell.ring(machine); });
+    const auto endAll = [&] {
+        const std::atomic<bool> never = false;
+        const ServerAccess last(options, never);
+        Machines left;
+        for (const std::size_t machine : all) {
+            if (subscriptions->hasLeft(machine)) {
+                left.insert(machine);
+            }
+        }
+        askAll<bool>(
+            servers, left, options.parallel,
+            [&](std::size_t machine) {
+                RemoteClient client = last.clientOf(servers[machine]);
+                subscriptions->unsubscribe(machine, client);
+                return true;
+            },
+            never, [](std::size_t, bool&&) {},
+            [&](std::size_t machine, const Failure& failure) {
+                outputs.err << "cimdhcp: " << printable(servers[machine].given)
+                            << ": a later watch will remove the subscriptions: " << failure.what()
+                            << '\n';
+            });
+    };
+    try {
+        watching.begin();
+        begun = true;
+        watching.goOnWhenTold();
+    } catch (...) {
+        endAll();
+        throw;
+    }
+    endAll();
 }
 
 }  // namespace cimdhcp

@@ -2,7 +2,6 @@
 
 #include <algorithm>
 #include <optional>
-#include <sstream>
 #include <utility>
 
 #include "broker/Broker.h"
@@ -13,6 +12,7 @@
 #include "cimom/ClassDeclaration.h"
 #include "cimom/ClassRepository.h"
 #include "cimom/Names.h"
+#include "cimom/Query.h"
 #include "manager/GuardedCall.h"
 #include "manager/RequestPath.h"
 #include "manager/RequestedObjects.h"
@@ -20,18 +20,6 @@
 namespace cimom {
 
 namespace {
-
-/// The class of which a query selects; empty for none.
-std::string fromClass(const std::string& query) {
-    std::istringstream words(query);
-    for (std::string word; words >> word;) {
-        if (sameName(word, "FROM")) {
-            words >> word;
-            return word;
-        }
-    }
-    return {};
-}
 
 /// A provider that is registered for indications, and which filters it has accepted.
 class IndicationProvider {
@@ -80,6 +68,7 @@ class ActiveFilters::Core {
             const CMPISelectExp* expression;
         };
 
+        std::optional<Query> query;  ///< there once it is active
         std::string fromClass;
         IndicationFilter asked;
         IndicationReceiver receiver;
@@ -168,10 +157,12 @@ void ActiveFilters::Core::log(const Status& status) const {
 }
 
 Status ActiveFilters::Core::read(Filter& filter) const {
-    const std::string className = fromClass(filter.asked.query);
-    if (className.empty()) {
-        return {CMPI_RC_ERR_INVALID_QUERY, "the query names no class"};
+    try {
+        filter.query = Query::parse(filter.asked.queryLanguage, filter.asked.query);
+    } catch (const QueryError& error) {
+        return {error.code, error.what()};
     }
+    const std::string& className = filter.query->className();
     if (filter.asked.sourceNameSpaces.empty()) {
         return {CMPI_RC_ERR_INVALID_NAMESPACE, "the filter names no source namespace"};
     }
@@ -183,8 +174,13 @@ Status ActiveFilters::Core::read(Filter& filter) const {
         nameSpace = path.nameSpace;
         filter.fromClass = path.className;
     }
-    if (!isTrue(here_.classes.find(filter.fromClass)->qualifier("Indication"))) {
+    const ClassDeclaration& declaration = *here_.classes.find(filter.fromClass);
+    if (!isTrue(declaration.qualifier("Indication"))) {
         return {CMPI_RC_ERR_INVALID_QUERY, filter.fromClass + " is not a class of indications"};
+    }
+    if (const auto unknown = filter.query->unknownProperty(declaration)) {
+        return {CMPI_RC_ERR_INVALID_QUERY,
+                filter.fromClass + " has no property \"" + *unknown + '"'};
     }
     return {};
 }
@@ -361,15 +357,19 @@ void ActiveFilters::Core::hand(Filter& filter, const broker::Broker& from,
     const ObjectPath& path = indication.instance.path;
     if (std::ranges::none_of(filter.asked.sourceNameSpaces,
                              [&](const auto& one) { return sameName(one, path.nameSpace); }) ||
-        !here_.classes.isA(path.className, filter.fromClass)) {
+        !filter.query->matches(indication.instance, [this](auto one, auto other) {
+            return here_.classes.isA(one, other);
+        })) {
         return;
     }
+    Indication selected = indication;
+    filter.query->project(selected.instance);
     const std::lock_guard receiving(filter.mutex);
     if (filter.ended || std::ranges::find(filter.sources, &from) == filter.sources.end()) {
         return;
     }
     try {
-        filter.receiver(indication);
+        filter.receiver(selected);
     } catch (const std::exception& error) {
         log({CMPI_RC_ERR_FAILED, std::string("an indication of class ") + path.className +
                                      " was lost: " + error.what()});

@@ -86,6 +86,12 @@ const std::string registeredSpecification =
     "RegisteredName:string RegisteredVersion:string AdvertiseTypes:uint16[] "
     "AdvertiseTypeDescriptions:string[] ";
 
+const std::string indication =
+    "IndicationIdentifier:string CorrelatedIndications:string[] IndicationTime:datetime "
+    "PerceivedSeverity:uint16 OtherSeverity:string IndicationFilterName:string "
+    "SequenceContext:string SequenceNumber:sint64 SourceInstance:string "
+    "SourceInstanceModelPath:string SourceInstanceHost:string ";
+
 struct Expected {
     std::string name;
     std::string superclass;
@@ -199,6 +205,13 @@ INSTANTIATE_TEST_SUITE_P(
                      "DeliveryRetryInterval:uint32 SubscriptionRemovalAction:uint16 "
                      "SubscriptionRemovalTimeInterval:uint32 ",
                  33, accessPointKeys},
+        Expected{"CIM_InstCreation", "CIM_InstIndication", indication, 11, {}},
+        Expected{"CIM_InstDeletion", "CIM_InstIndication", indication, 11, {}},
+        Expected{"CIM_InstModification",
+                 "CIM_InstIndication",
+                 indication + "PreviousInstance:string ",
+                 12,
+                 {}},
         Expected{"CIM_NamespaceInManager", "CIM_Dependency",
                  "Antecedent:CIM_ObjectManager Dependent:CIM_Namespace ", 2, dependency},
         Expected{"CIM_CommMechanismForManager", "CIM_ServiceAccessBySAP",
@@ -326,8 +339,10 @@ TEST(Schema, ClassesAreAbstractAndAssociationsAsTheSchemaHasThem) {
                                          "CIM_Component",
                                          "CIM_Service",
                                          "CIM_WBEMService",
-                                         "CIM_RegisteredSpecification",
-                                         "CIM_ListenerDestination"};
+                                         "CIM_Indication",
+                                         "CIM_InstIndication",
+                                         "CIM_ListenerDestination",
+                                         "CIM_RegisteredSpecification"};
     for (const ClassDeclaration* each : repository().classes()) {
         EXPECT_EQ(says(each->qualifier("Abstract"), true), abstract.contains(each->name))
             << each->name;
@@ -486,8 +501,12 @@ TEST(Schema, RegisteredClassesAreTheElevenServedOnes) {
     std::set<std::string> served;
     const std::set<std::string> ends{"QVXZR_ComputerSystem", "QVXZR_SPComputerSystem",
                                      "QVXZR_IPProtocolEndpoint", "QVXZR_IPAssignmentSettingData"};
-    const std::set<std::string> extensions{"QVXZR_DHCPLease", "QVXZR_DHCPLeaseOfEndpoint",
-                                           "QVXZR_DHCPInterface", "QVXZR_DHCPDiagnostic"};
+    const std::set<std::string> extensions{"QVXZR_DHCPLease",
+                                           "QVXZR_DHCPLeaseOfEndpoint",
+                                           "QVXZR_DHCPInterface",
+                                           "QVXZR_DHCPDiagnostic",
+                                           "QVXZR_RegisteredDHCPClientProfile",
+                                           "QVXZR_DHCPClientConformsToProfile"};
     for (const ClassDeclaration* each : repository().classes()) {
         if (each->name.starts_with("QVXZR_") && !ends.contains(each->name) &&
             !extensions.contains(each->name)) {

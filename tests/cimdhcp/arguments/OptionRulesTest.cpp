@@ -34,6 +34,29 @@ TEST(OptionRules, NamesServers) {
     EXPECT_FALSE(Options{}.remote());
 }
 
+TEST(OptionRules, SaysHowToWatch) {
+    WatchCommand watch;
+    EXPECT_EQ(line({"watch"}).command, Command(watch));
+    watch.interfaces = {"eth0", "eth1"};
+    watch.poll = std::chrono::seconds(5);
+    EXPECT_EQ(line({"watch", "eth0", "--poll", "5", "eth1"}).command, Command(watch));
+    watch = {};
+    watch.listen = "192.0.2.9";
+    EXPECT_EQ(line({"--connect", "h", "watch", "--listen", "192.0.2.9"}).command, Command(watch));
+    EXPECT_EQ(line({"profiles"}).command, Command(ProfilesCommand{}));
+    for (const char* option :
+         {"--poll=0", "--poll=86401", "--poll=x", "--sort=STATE", "--count", "--format=mof"}) {
+        EXPECT_NE(refusal({"watch", option}), "accepted") << option;
+    }
+    const std::string forServers =
+        "--listen is for servers that tell of changes: with --connect or --hosts, and without "
+        "--poll";
+    EXPECT_EQ(refusal({"watch", "--listen", "::1"}), forServers);
+    EXPECT_EQ(refusal({"--connect", "h", "watch", "--poll", "1", "--listen", "::1"}), forServers);
+    EXPECT_NE(refusal({"profiles", "--format", "mof"}), "accepted");
+    EXPECT_EQ(line({"profiles", "--sort", "version"}).options.sort, "version");
+}
+
 TEST(OptionRules, AnAddressInBracketsKeepsThem) {
     const std::vector<std::string> servers{"[::1]", "[::1]:5988", "[a,b]"};
     EXPECT_EQ(line({"--connect", "[::1]", "--connect=[::1]:5988", "--connect=[a,b]", "show"})

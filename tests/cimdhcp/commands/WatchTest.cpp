@@ -1,10 +1,12 @@
 // What "watch" makes of two looks at a machine, and the lines that it writes.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <unistd.h>
 
 #include <sstream>
 
 #include "commands/WatchLog.h"
+#include "commands/WatchSubscriptions.h"
 #include "commands/WatchedChanges.h"
 #include "text/Failure.h"
 #include "zrclient/NodeLexicon.h"
@@ -263,6 +265,33 @@ TEST(WatchLog, WritesWhatTimeAloneChangesOnce) {
     EXPECT_EQ(written.take(), "2026-11-22T07:00:00Z  eth0  bound 192.0.2.17 -> expired\n");
     log.age(now + 3 * hour + 1);
     EXPECT_EQ(written.take(), "");
+}
+
+TEST(WatchName, TellsTheProcessesOfTheSameUserAndHost) {
+    const WatchName name("alpha", "ada", 71, 900);
+    EXPECT_EQ(name.text(), "cimdhcp-watch:alpha:ada:71.900:");
+    const auto onlyOther = [](std::uint64_t process, std::uint64_t start) {
+        return process == 72 && start == 800;
+    };
+    const auto mayRemove = [&](const std::string& left) { return name.mayRemove(left, onlyOther); };
+    EXPECT_TRUE(mayRemove("cimdhcp-watch:alpha:ada:71.900:listener"));
+    EXPECT_TRUE(mayRemove("cimdhcp-watch:alpha:ada:70.900:listener"));
+    EXPECT_TRUE(mayRemove("cimdhcp-watch:alpha:ada:72.799:listener")) << "another of that number";
+    EXPECT_FALSE(mayRemove("cimdhcp-watch:alpha:ada:72.800:listener")) << "it runs";
+    for (const char* other :
+         {"", "listener", "cimdhcp-watch:alpha:bob:70.900:listener",
+          "cimdhcp-watch:beta:ada:70.900:listener", "cimdhcp-watch:alpha:ada:",
+          "cimdhcp-watch:alpha:ada:70", "cimdhcp-watch:alpha:ada:70.900",
+          "cimdhcp-watch:alpha:ada:x.900:listener", "cimdhcp-watch:alpha:ada:70.x:listener"}) {
+        EXPECT_FALSE(mayRemove(other)) << other;
+    }
+}
+
+TEST(WatchName, OfThisProcessIsNotThatOfAnother) {
+    const std::string name = WatchName().text();
+    EXPECT_THAT(name, testing::StartsWith("cimdhcp-watch:"));
+    EXPECT_THAT(name, testing::HasSubstr(':' + std::to_string(::getpid()) + '.'));
+    EXPECT_THAT(name, testing::Not(testing::EndsWith(".0:")));
 }
 
 TEST(WatchLog, EndsWhenNoOneTakesItsLines) {

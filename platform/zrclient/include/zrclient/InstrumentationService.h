@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <memory>
 #include <mutex>
+#include <vector>
 
 #include "zrclient/Snapshot.h"
 #include "zrclient/SnapshotSource.h"
@@ -48,6 +49,36 @@ class InstrumentationService {
     /// Replaces the source; the next current() reads it. Cursors keep what they hold.
     void useSource(std::unique_ptr<SnapshotSource> source);
 
+    /// A wait for snapshots, for one thread at a time; none is started. While there is none,
+    /// nothing is done that no request asks for. Ends before the service.
+    class Waiter {
+      public:
+        /// Throws std::system_error when the system has no descriptor left.
+        explicit Waiter(InstrumentationService& service);
+        ~Waiter();
+        Waiter(const Waiter&) = delete;
+        Waiter& operator=(const Waiter&) = delete;
+
+        /// Waits until there is another snapshot than the one given, whoever has read it, and
+        /// returns the newest; at once if that is so already. Null after stop(). Of what
+        /// changes quickly, not every state is seen. Throws std::bad_alloc.
+        [[nodiscard]] std::shared_ptr<const Snapshot> next(
+            const std::shared_ptr<const Snapshot>& known);
+
+        /// Ends the wait, and all to come. From any thread.
+        void stop() noexcept;
+
+      private:
+        friend class InstrumentationService;
+
+        void wake() const noexcept;
+        [[nodiscard]] bool wait(const ChangeSigns& signs) const;
+
+        InstrumentationService& service_;
+        UniqueFd event_;
+        std::atomic<bool> stopped_{false};
+    };
+
     /// How often a source was read since the start.
     [[nodiscard]] std::uint64_t readings() const noexcept { return readings_.load(); }
 
@@ -55,6 +86,8 @@ class InstrumentationService {
     [[nodiscard]] SnapshotSource& openedSource();
     [[nodiscard]] std::shared_ptr<const Snapshot> published();
     std::shared_ptr<const Snapshot> readSource();
+    [[nodiscard]] ChangeSigns signs();
+    void wakeWaiters() noexcept;
 
     // Two locks, so that latest() never waits for a reading under way. The first
     // is held while the source is asked, the second only to copy or swap the
@@ -63,6 +96,8 @@ class InstrumentationService {
     std::unique_ptr<SnapshotSource> source_;
     std::mutex snapshotMutex_;
     std::shared_ptr<const Snapshot> snapshot_;
+    std::mutex waitersMutex_;
+    std::vector<Waiter*> waiters_;
     std::atomic<std::uint64_t> readings_{0};
 };
 
