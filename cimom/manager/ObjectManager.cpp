@@ -80,11 +80,11 @@ void ObjectManager::Implementation::serve(const Registration& registration) {
         throw LoadError(who + " is in none of the schema's files");
     }
     Provider& provider = providers_->provider(registration.location, registration.provider);
+    if (registration.indication) {
+        filters_.serve(*declaration, provider, registration.nameSpaces);
+    }
     serve({declaration, &provider, nullptr, registration.instance, registration.association, {}},
           registration.nameSpaces, who);
-    if (registration.indication) {
-        filters_.serve(*declaration, provider, served_.back().nameSpaces);
-    }
 }
 
 void ObjectManager::Implementation::serve(std::unique_ptr<OwnClass> own) {
