@@ -178,6 +178,33 @@ INSTANTIATE_TEST_SUITE_P(
         Expected{"CIM_ReferencedProfile", "CIM_ReferencedSpecification",
                  "Antecedent:CIM_RegisteredProfile Dependent:CIM_RegisteredProfile ", 2,
                  dependency},
+        Expected{"CIM_IndicationFilter", "CIM_ManagedElement",
+                 managedElement + accessPoint +
+                     "Name:string SourceNamespace:string SourceNamespaces:string[] "
+                     "IndividualSubscriptionSupported:boolean Query:string QueryLanguage:string ",
+                 13, accessPointKeys},
+        Expected{"CIM_ListenerDestinationCIMXML", "CIM_ListenerDestination",
+                 managedElement + accessPoint +
+                     "Name:string PersistenceType:uint16 OtherPersistenceType:string "
+                     "Destination:string Protocol:uint16 OtherProtocol:string ",
+                 13, accessPointKeys},
+        Expected{"CIM_IndicationSubscription",
+                 "",
+                 "Filter:CIM_IndicationFilter Handler:CIM_ListenerDestination "
+                 "OnFatalErrorPolicy:uint16 OtherOnFatalErrorPolicy:string "
+                 "FailureTriggerTimeInterval:uint64 SubscriptionState:uint16 "
+                 "OtherSubscriptionState:string TimeOfLastStateChange:datetime "
+                 "SubscriptionDuration:uint64 SubscriptionStartTime:datetime "
+                 "SubscriptionTimeRemaining:uint64 RepeatNotificationPolicy:uint16 "
+                 "SubscriptionInfo:string ",
+                 13,
+                 {"Filter", "Handler"}},
+        Expected{"CIM_IndicationService", "CIM_Service",
+                 element + accessPoint + serviceProperties +
+                     "FilterCreationEnabled:boolean DeliveryRetryAttempts:uint16 "
+                     "DeliveryRetryInterval:uint32 SubscriptionRemovalAction:uint16 "
+                     "SubscriptionRemovalTimeInterval:uint32 ",
+                 33, accessPointKeys},
         Expected{"CIM_InstCreation", "CIM_InstIndication", indication, 11, {}},
         Expected{"CIM_InstDeletion", "CIM_InstIndication", indication, 11, {}},
         Expected{"CIM_InstModification",
@@ -314,6 +341,7 @@ TEST(Schema, ClassesAreAbstractAndAssociationsAsTheSchemaHasThem) {
                                          "CIM_WBEMService",
                                          "CIM_Indication",
                                          "CIM_InstIndication",
+                                         "CIM_ListenerDestination",
                                          "CIM_RegisteredSpecification"};
     for (const ClassDeclaration* each : repository().classes()) {
         EXPECT_EQ(says(each->qualifier("Abstract"), true), abstract.contains(each->name))

@@ -5,9 +5,11 @@
 #include <map>
 #include <memory>
 #include <mutex>
+#include <optional>
 #include <string>
 #include <thread>
 #include <utility>
+#include <vector>
 
 #include "Delivery.h"
 #include "SubscriptionRecords.h"

@@ -8,11 +8,14 @@
 
 #include <array>
 #include <csignal>
+#include <cstdlib>
 #include <set>
 
 #include "indications/Listeners.h"
+#include "kit/FileContent.h"
 #include "kit/RawServer.h"
 #include "kit/TemporaryDirectory.h"
+#include "kit/WireSupport.h"
 
 namespace cimom::wbem {
 namespace {
@@ -154,6 +157,32 @@ TEST_F(Deliveries, NoRedirectionIsFollowed) {
     tell(*delivery, "one");
     EXPECT_EQ(log_.await("indication 0 lost, HTTP 307"), 1U);
     EXPECT_THAT(other.requests(), IsEmpty());
+}
+
+TEST_F(Deliveries, AreEncryptedForListenersThatAreVouchedFor) {
+    settings_.retries = 0;
+    const std::string key = directory_ / "key.pem";
+    const std::string certificate = directory_ / "cert.pem";
+    const std::string command =
+        "openssl req -x509 -newkey ec -pkeyopt ec_paramgen_curve:prime256v1 -nodes -days 2 -subj "
+        "/CN=localhost -addext subjectAltName=IP:127.0.0.1 -keyout " +
+        key + " -out " + certificate + " 2>/dev/null";
+    ASSERT_EQ(std::system(command.c_str()), 0);
+    ServerSettings settings;
+    settings.tls.emplace(
+        ServerSettings::Tls{ZR::Testing::readFile(certificate), ZR::Testing::readFile(key)});
+    // What a WBEM server refuses has arrived there.
+    const test::TestServer server(settings);
+    const std::string url = "https://127.0.0.1:" + std::to_string(server.port()) + "/cimom";
+    {
+        const auto stranger = to(url);
+        tell(*stranger, "one");
+        EXPECT_EQ(log_.await("indication 0 lost, its certificate is not to be trusted"), 1U);
+    }
+    settings_.caCertificates = certificate;
+    const auto known = to(url);
+    tell(*known, "two");
+    EXPECT_EQ(log_.await("indication 0 lost, HTTP 400"), 1U);
 }
 
 TEST_F(Deliveries, ALongResponseIsNotReadToItsEnd) {

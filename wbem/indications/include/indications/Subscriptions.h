@@ -7,6 +7,8 @@
 
 namespace cimom::wbem {
 
+class SubscriptionStore;
+
 /// What clients want to be told of, and who tells them: filters, listener destinations and
 /// subscriptions as classes of the object manager in root/interop, kept over restarts, and
 /// the indications that go to the listeners of the subscriptions.
@@ -26,7 +28,7 @@ class Subscriptions {
     Subscriptions& operator=(const Subscriptions&) = delete;
 
   private:
-    std::shared_ptr<class SubscriptionStore> store_;
+    std::shared_ptr<SubscriptionStore> store_;
 };
 
 }  // namespace cimom::wbem
