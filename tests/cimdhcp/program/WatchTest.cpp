@@ -2,6 +2,8 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <csignal>
+
 #include "ProgramRun.h"
 #include "ServedProgram.h"
 #include "kit/RawServer.h"
@@ -71,6 +73,26 @@ class Watch : public test::ProgramTest {
         return runAs("/bin/sh", words, extra);
     }
 
+    test::ServedProgram serve() const {
+        return {program(),
+                {"--tree", tree(), "--data-dir", dataDir(), "serve", "--listen", "127.0.0.1:0",
+                 "--subscriptions", directory() / "subscriptions"},
+                {"ZR_CONFIG=" + (directory() / "platform.conf"), "ZR_LOG_SINK=none"}};
+    }
+
+    /// The subscriptions, filters and destinations at a server.
+    std::string leftAt(const test::ServedProgram& server) const {
+        std::string left;
+        for (const char* className : {"CIM_IndicationSubscription", "CIM_IndicationFilter",
+                                      "CIM_ListenerDestinationCIMXML"}) {
+            const Ended ended = runAs(program(), {"--connect", server.url(), "--namespace",
+                                                  "root/interop", "names", className});
+            EXPECT_EQ(ended.status, 0) << ended.err;
+            left += ended.out;
+        }
+        return left;
+    }
+
     std::vector<std::string> onTree(std::vector<std::string> arguments) const {
         arguments.insert(arguments.begin(), {"--tree", tree(), "--data-dir", dataDir(), "watch"});
         return arguments;
@@ -94,11 +116,47 @@ TEST_F(Watch, HasAnArrowWhereTheLocaleHasUtf8) {
     EXPECT_THAT(ended.out, HasSubstr("  eth1  absent \u2192 bound 192.0.2.17 from 192.0.2.1\n"));
 }
 
+TEST_F(Watch, IsToldHereWithoutAServer) {
+    prepare();
+    const Ended ended = watch(onTree({}), "INT", {{"LC_ALL", "C"}});
+    EXPECT_EQ(ended.status, 0);
+    EXPECT_THAT(ended.out, MatchesRegex(std::string(time) +
+                                        "  eth1  absent -> bound 192.0.2.17 from 192.0.2.1\n"));
+}
+
+TEST_F(Watch, IsToldByServersAndLeavesNothingAtThem) {
+    prepare();
+    const test::ServedProgram server = serve();
+    const Ended ended = watch({"--connect", server.url(), "watch"}, "INT", {{"LC_ALL", "C"}});
+    EXPECT_EQ(ended.status, 0) << ended.err;
+    EXPECT_THAT(ended.out, MatchesRegex(std::string(time) +
+                                        "  eth1  absent -> bound 192.0.2.17 from 192.0.2.1\n"));
+    EXPECT_EQ(leftAt(server), "");
+}
+
+TEST_F(Watch, RemovesWhatARunHasLeftThatWasKilled) {
+    prepare();
+    const test::ServedProgram server = serve();
+    const std::vector<std::string> arguments{"--connect", server.url(), "watch"};
+    EXPECT_EQ(watch(arguments, "KILL").status, 128 + SIGKILL);
+    EXPECT_THAT(leftAt(server), HasSubstr("CIM_InstModification"));
+    prepare();
+    EXPECT_EQ(watch(arguments, "TERM").status, 0);
+    EXPECT_EQ(leftAt(server), "");
+}
+
+TEST_F(Watch, NeedsProvidersThatTellOfChanges) {
+    prepare();
+    std::vector<std::string> arguments = onTree({});
+    arguments.insert(arguments.begin(), "--exact");
+    const Ended ended = runAs(program(), arguments);
+    EXPECT_EQ(ended.status, 3);
+    EXPECT_THAT(ended.err, HasSubstr("--poll SECONDS looks again and again"));
+}
+
 TEST_F(Watch, AsksServersAgainAndAgain) {
     prepare();
-    const test::ServedProgram server(
-        program(), {"--tree", tree(), "--data-dir", dataDir(), "serve", "--listen", "127.0.0.1:0"},
-        {"ZR_CONFIG=" + (directory() / "platform.conf"), "ZR_LOG_SINK=none"});
+    const test::ServedProgram server = serve();
     const Ended ended = watch(
         {"--connect", server.url(), "watch", "--poll", "1", "--format", "json", "eth1"}, "TERM");
     EXPECT_EQ(ended.status, 0);
@@ -115,6 +173,30 @@ TEST_F(Watch, OfOneServerNeedsAResponseToBegin) {
     EXPECT_EQ(ended.status, 3);
     EXPECT_EQ(ended.out, "");
     EXPECT_THAT(ended.err, testing::StartsWith("cimdhcp: " + url + ": "));
+}
+
+class ProfilesCommand : public Watch {};
+
+TEST_F(ProfilesCommand, TellsWhatAServerAdvertises) {
+    prepare();
+    const test::ServedProgram server = serve();
+    for (const auto& where :
+         {std::vector<std::string>{"--tree", tree()}, {"--connect", server.url()}}) {
+        std::vector<std::string> arguments = where;
+        arguments.emplace_back("profiles");
+        EXPECT_EQ(runAs(program(), arguments),
+                  (Ended{0,
+                         "ORGANIZATION  PROFILE      VERSION  INSTANCES\n"
+                         "DMTF          DHCP Client  1.0.4    1\n",
+                         ""}));
+        arguments.insert(arguments.end(), {"--format", "json"});
+        const Ended json = runAs(program(), arguments);
+        EXPECT_THAT(json.out, testing::StartsWith("{\n  \"namespace\": \"root/interop\""));
+        EXPECT_THAT(json.out, HasSubstr("\"instances\": 1"));
+        arguments.back() = "table";
+        arguments.emplace_back("--count");
+        EXPECT_EQ(runAs(program(), arguments), (Ended{0, "1\n", ""}));
+    }
 }
 
 }  // namespace
