@@ -97,10 +97,7 @@ class Bell {
 
 /// The interfaces as "show" has them.
 std::vector<InterfaceOverview> lookAt(Client& client) {
-    const ServedInstances served = askProvider(client);
-    MachineInterfaces machine = client.interfaces(served);
-    addServed(served, machine.interfaces);
-    return std::move(machine.interfaces);
+    return askMachine(client, AskDiagnostics::No).interfaces;
 }
 
 WatchLog logFor(const WatchCommand& command, std::vector<std::string> machines, bool hosts,
