@@ -466,7 +466,7 @@ printf '[TEST_Thing]\nprovider: A\n' >"$directory/wrong.registration"
 refused 1 'the section of TEST_Thing lacks an entry' -t sfcb -r "$directory/wrong.registration"
 printf '[TEST_Thing]\nprovider: A"; rm\n' >"$directory/wrong.registration"
 refused 1 'no value for provider' -t sfcb -r "$directory/wrong.registration"
-printf '[TEST_Thing]\ntype: indication\n' >"$directory/wrong.registration"
-refused 1 'unknown type indication' -t sfcb -r "$directory/wrong.registration"
+printf '[TEST_Thing]\ntype: method\n' >"$directory/wrong.registration"
+refused 1 'unknown type method' -t sfcb -r "$directory/wrong.registration"
 
 exit $((failures > 0))

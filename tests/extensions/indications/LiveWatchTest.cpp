@@ -155,10 +155,12 @@ TEST(LiveWatch, AThousandLinksAtOnceAreAllTold) {
         run("mkdir -p /var/lib/dhcp; for i in $(seq " + std::to_string(links) +
             "); do echo \"lease { interface \\\"d$i\\\"; fixed-address "
             "10.1.$((i / 250)).$((1 + i % 250)); option dhcp-server-identifier 198.51.100.1; "
-            "expire 5 2038/01/01 00:00:00; }\"; done > /var/lib/dhcp/dhclient.leases");
+            "expire $(date -u -d '+3600 seconds' '+%w %Y/%m/%d %T'); }\"; done > "
+            "/var/lib/dhcp/dhclient.leases");
         run("for i in $(seq " + std::to_string(links) +
             "); do echo link add d$i type bridge; echo link set d$i up; echo addr add "
-            "10.1.$((i / 250)).$((1 + i % 250))/32 dev d$i; "
+            "10.1.$((i / 250)).$((1 + i % 250))/24 dev d$i valid_lft 3600 "
+            "preferred_lft 3600; "
             "done > /run/links && ip -batch /run/links");
         const auto end = std::chrono::steady_clock::now() + 60s;
         while (told.all().size() < links && std::chrono::steady_clock::now() < end) {
