@@ -20,6 +20,7 @@
 #include "Lindows/DHCPRemoteAccessAvailableToElement.h"
 #include "Lindows/ElementCapabilities.h"
 #include "Lindows/SAPSAPDependency.h"
+#include "RunBenchmarks.h"
 #include "cimom/Instance.h"
 #include "kit/Host.h"
 #include "zrclient/Moniker.h"
@@ -220,12 +221,10 @@ int main(int argc, char** argv) {
                  "QVXZR_IPAssignmentSettingData");
     registerStep("to the DHCP endpoint of an IP endpoint", &SAPSAPDependency::getDHCPSAPMoniker,
                  "QVXZR_IPProtocolEndpoint");
-    benchmark::Initialize(&argc, argv);
-    if (benchmark::ReportUnrecognizedArguments(argc, argv)) {
+    RememberingReporter reporter;
+    if (!bench::run(argc, argv, reporter)) {
         return 2;
     }
-    RememberingReporter reporter;
-    benchmark::RunSpecifiedBenchmarks(&reporter);
     printGrowth(reporter);
     return 0;
 }

@@ -13,6 +13,7 @@
 #include <vector>
 
 #include "BenchmarkMachine.h"
+#include "RunBenchmarks.h"
 #include "cimom/Instance.h"
 #include "include/TracePoint.h"
 #include "kit/Host.h"
@@ -166,12 +167,10 @@ int main(int argc, char** argv) {
             ->Arg(100)
             ->Arg(1000);
     }
-    benchmark::Initialize(&argc, argv);
-    if (benchmark::ReportUnrecognizedArguments(argc, argv)) {
+    RememberingReporter reporter;
+    if (!bench::run(argc, argv, reporter)) {
         return 2;
     }
-    RememberingReporter reporter;
-    benchmark::RunSpecifiedBenchmarks(&reporter);
     printRatios(reporter.nanoseconds);
     return 0;
 }

@@ -10,6 +10,7 @@
 
 #include "BenchmarkMachine.h"
 #include "DHCPClientGateway.h"
+#include "RunBenchmarks.h"
 #include "kit/Host.h"
 #include "zrcommon/SystemName.h"
 
@@ -134,12 +135,10 @@ int main(int argc, char** argv) {
             ->Arg(1000)
             ->Unit(benchmark::kMicrosecond);
     }
-    benchmark::Initialize(&argc, argv);
-    if (benchmark::ReportUnrecognizedArguments(argc, argv)) {
+    RememberingReporter reporter;
+    if (!bench::run(argc, argv, reporter)) {
         return 2;
     }
-    RememberingReporter reporter;
-    benchmark::RunSpecifiedBenchmarks(&reporter);
     printDifferences(reporter);
     return 0;
 }

@@ -39,6 +39,7 @@
 #include <vector>
 
 #include "OwnMachine.h"
+#include "RunBenchmarks.h"
 #include "StateReaders.h"
 #include "zrclient/Instrumentation.h"
 #include "zrclient/InstrumentationService.h"
@@ -366,13 +367,11 @@ int main(int argc, char** argv) {
             ->Arg(count)
             ->UseManualTime();
     }
-    benchmark::Initialize(&argc, argv);
-    if (benchmark::ReportUnrecognizedArguments(argc, argv)) {
-        return 2;
-    }
     enterMachineWithALease();
     RememberingReporter reporter;
-    benchmark::RunSpecifiedBenchmarks(&reporter);
+    if (!bench::run(argc, argv, reporter)) {
+        return 2;
+    }
     printRatios(reporter.microseconds);
     return 0;
 }

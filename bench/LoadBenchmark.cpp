@@ -19,6 +19,7 @@
 #include <vector>
 
 #include "OwnMachine.h"
+#include "RunBenchmarks.h"
 #include "cimom/ObjectManager.h"
 #include "cimom/Results.h"
 
@@ -138,12 +139,10 @@ int main(int argc, char** argv) {
         [growth](benchmark::State& state) { firstResponse(state, growth); })
         ->Unit(benchmark::kMicrosecond)
         ->UseRealTime();
-    benchmark::Initialize(&argc, argv);
-    if (benchmark::ReportUnrecognizedArguments(argc, argv)) {
-        return 1;
-    }
     Reporter reporter;
-    benchmark::RunSpecifiedBenchmarks(&reporter);
+    if (!bench::run(argc, argv, reporter)) {
+        return 2;
+    }
     const double floor = reporter.time("bare load");
     const double response = reporter.time("load to first response/real_time");
     std::printf("\nload to first response: %.0f us, %.1f of a bare load (%.0f us)\n", response,

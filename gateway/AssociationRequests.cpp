@@ -7,31 +7,15 @@
 
 #include "Links.h"
 #include "Lookup.h"
-#include "Refusal.h"
+#include "providerutilities/Refusal.h"
 #include "zrcommon/Strings.h"
 
 namespace ZR::DHCPClientGateway {
 
 namespace {
 
-bool isGiven(const char* name) {
-    return name != nullptr && *name != '\0';
-}
-
-bool accepts(const char* wanted, const char* role) {
-    return !isGiven(wanted) || equalNames(wanted, role);
-}
-
-/// The table knows the superclasses, so that a host need not be sure of them; a host may
-/// know of more, where its schema is larger.
-bool acceptsClass(const Request& request, const char* wanted, const ServedClass& served) {
-    if (!isGiven(wanted) || derivesFrom(served, wanted)) {
-        return true;
-    }
-    CMPIStatus status{CMPI_RC_OK, nullptr};
-    const CMPIBoolean derived = request.broker->eft->classPathIsA(
-        request.broker, makePath(request, served.name), wanted, &status);
-    return status.rc == CMPI_RC_OK && derived != 0;
+bool acceptsServed(const Request& request, const char* wanted, const ServedClass& served) {
+    return acceptsClass(request.broker, request.nameSpace, wanted, served.name, served.ancestors);
 }
 
 /// An association in which the object can take part, and where.
@@ -44,13 +28,13 @@ std::vector<Part> partsOf(const Request& request, const ServedClass& source,
                           const AssociationFilter& filter) {
     std::vector<Part> parts;
     for (const Association& association : allAssociations()) {
-        if (!acceptsClass(request, filter.association, *findClass(association.name))) {
+        if (!acceptsServed(request, filter.association, *findClass(association.name))) {
             continue;
         }
         for (std::size_t near = 0; near < association.ends.size(); ++near) {
             if (takes(association.ends.at(near), source) &&
-                accepts(filter.role, association.ends.at(near).role) &&
-                accepts(filter.resultRole, association.ends.at(1 - near).role)) {
+                acceptsRole(filter.role, association.ends.at(near).role) &&
+                acceptsRole(filter.resultRole, association.ends.at(1 - near).role)) {
                 parts.push_back({&association, near});
             }
         }
@@ -61,7 +45,7 @@ std::vector<Part> partsOf(const Request& request, const ServedClass& source,
 /// The classes at an end of which a client may want to see objects.
 bool mayGive(const Request& request, const End& end, const char* resultClass) {
     return std::any_of(end.classes.begin(), end.classes.end(), [&](const char* name) {
-        return acceptsClass(request, resultClass, *findClass(name));
+        return acceptsServed(request, resultClass, *findClass(name));
     });
 }
 
@@ -101,7 +85,7 @@ void associators(const Request& request, const AssociationFilter& filter,
             if (far == nullptr) {
                 far = findClass(end.classes.front());
             }
-            if (acceptsClass(request, filter.resultClass, *far)) {
+            if (acceptsServed(request, filter.resultClass, *far)) {
                 delivery.give(*far, object);
             }
         }

@@ -7,7 +7,7 @@
 #include <string>
 
 #include "Classes.h"
-#include "Keys.h"
+#include "providerutilities/Keys.h"
 
 /// The association classes, as a table of their ends: two objects are associated when what
 /// their keys tell of the link is the same.

@@ -7,8 +7,8 @@
 #include "AssociationRequests.h"
 #include "InstanceRequests.h"
 #include "Modification.h"
-#include "Refusal.h"
 #include "providerutilities/ProviderUtilities.h"
+#include "providerutilities/Refusal.h"
 #include "zrclient/OneMoment.h"
 
 // The factories of the exact provider, which is known by nothing else.

@@ -4,8 +4,8 @@
 #include <string>
 #include <unordered_map>
 
-#include "Refusal.h"
 #include "providerutilities/ProviderUtilities.h"
+#include "providerutilities/Refusal.h"
 
 namespace ZR::DHCPClientGateway {
 
@@ -25,7 +25,7 @@ std::vector<Object> objectsAt(const Request& request, const End& end, Form form,
         if (served.server == Server::exact) {
             append(objects, ask(request, served, form, keys.value_or(KeyTexts{})));
         } else if (!keys) {
-            append(objects, askOthers(request, served));
+            append(objects, askOthers(request, served, form));
         } else if (auto found = askOthersFor(request, served, *keys)) {
             objects.push_back(*std::move(found));
         }

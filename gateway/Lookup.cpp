@@ -3,45 +3,16 @@
 #include <algorithm>
 #include <string>
 
-#include "Refusal.h"
 #include "providerutilities/ProviderUtilities.h"
+#include "providerutilities/Refusal.h"
 
 namespace ZR::DHCPClientGateway {
 
 namespace {
 
-[[noreturn]] void refuseKey(const ServedClass& served, const char* key, const char* what) {
-    throw Refusal(CMPI_RC_ERR_INVALID_PARAMETER,
-                  std::string("the key ") + key + " of " + served.name + ' ' + what);
-}
-
-void requireKeys(const ServedClass& served, const Keys& keys) {
-    const bool references = served.server == Server::gateway;
-    for (const char* name : served.keys) {
-        const Key* key = keys.find(name);
-        if (key == nullptr) {
-            refuseKey(served, name, "is missing");
-        }
-        if (references ? key->reference == nullptr : !key->isText) {
-            refuseKey(served, name, references ? "is not a reference" : "is not a text");
-        }
-    }
-    if (keys.size() != served.keys.size()) {
-        throw Refusal(CMPI_RC_ERR_INVALID_PARAMETER,
-                      std::string("the path has a key that ") + served.name + " does not have");
-    }
-}
-
-[[noreturn]] void notFound(const ServedClass& served, const Keys& keys) {
-    std::string text = std::string("there is no ") + served.name;
-    char separator = '.';
-    for (const Key& key : keys) {
-        const std::string value =
-            key.isText ? '"' + key.text + '"' : "a " + classNameOf(key.reference);
-        text += separator + key.name + '=' + value;
-        separator = ',';
-    }
-    throw Refusal(CMPI_RC_ERR_NOT_FOUND, text);
+void requireOwnKeys(const ServedClass& served, const Keys& keys) {
+    requireKeys(served.name, served.keys,
+                served.server == Server::gateway ? KeyKind::reference : KeyKind::text, keys);
 }
 
 KeyTexts textsOf(const ServedClass& served, const Keys& keys) {
@@ -80,10 +51,10 @@ const ServedClass& servedClassOf(const Request& request) {
 
 Object find(const Request& request, const ServedClass& served, Form form) {
     const Keys keys(request.path);
-    requireKeys(served, keys);
+    requireOwnKeys(served, keys);
     std::optional<Object> found = lookUp(request, served, keys, form);
     if (!found) {
-        notFound(served, keys);
+        refuseMissing(served.name, keys);
     }
     return *std::move(found);
 }
@@ -91,14 +62,14 @@ Object find(const Request& request, const ServedClass& served, Form form) {
 Link findLink(const Request& request, const ServedClass& served) {
     const Association& association = *findAssociation(served);
     const Keys keys(request.path);
-    requireKeys(served, keys);
+    requireOwnKeys(served, keys);
     const std::size_t near = association.listed;
     Request forEnd = request;
     forEnd.path = keys.find(association.ends.at(near).role)->reference;
     const CMPIObjectPath* farPath = keys.find(association.ends.at(1 - near).role)->reference;
     const ServedClass* nearClass = findClass(classNameOf(forEnd.path));
     if (nearClass == nullptr || !takes(association.ends.at(near), *nearClass)) {
-        notFound(served, keys);
+        refuseMissing(served.name, keys);
     }
     const Object object = find(forEnd, *nearClass, Form::names);
     for (const Link& link : linksOf(request, association, near, object)) {
@@ -107,7 +78,7 @@ Link findLink(const Request& request, const ServedClass& served) {
             return link;
         }
     }
-    notFound(served, keys);
+    refuseMissing(served.name, keys);
 }
 
 }  // namespace ZR::DHCPClientGateway

@@ -6,10 +6,10 @@
 
 #include "Completion.h"
 #include "Lookup.h"
-#include "Refusal.h"
 #include "UnchangedReason.h"
 #include "Values.h"
 #include "providerutilities/ProviderUtilities.h"
+#include "providerutilities/Refusal.h"
 #include "zrcommon/Strings.h"
 
 namespace ZR::DHCPClientGateway {

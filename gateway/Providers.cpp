@@ -3,8 +3,8 @@
 #include <atomic>
 #include <utility>
 
-#include "Refusal.h"
 #include "providerutilities/ProviderUtilities.h"
+#include "providerutilities/Refusal.h"
 
 namespace ZR::DHCPClientGateway {
 
@@ -24,8 +24,8 @@ const CMPIObjectPath* pathOf(const CMPIInstance* instance) {
 
 /// An object of another provider by a path of the request's own: one that comes from the
 /// object manager may name a host, and references do not.
-std::optional<Object> withOwnPath(const Request& request, const CMPIInstance* instance) {
-    const CMPIObjectPath* path = pathOf(instance);
+std::optional<Object> withOwnPath(const Request& request, const CMPIObjectPath* path,
+                                  const CMPIInstance* instance) {
     if (path == nullptr) {
         return std::nullopt;
     }
@@ -77,16 +77,24 @@ std::vector<Object> ask(const Request& request, const ServedClass& served, Form 
     return objects;
 }
 
-std::vector<Object> askOthers(const Request& request, const ServedClass& served) {
+std::vector<Object> askOthers(const Request& request, const ServedClass& served, Form form) {
     std::vector<Object> objects;
     CMPIStatus status{CMPI_RC_OK, nullptr};
-    CMPIEnumeration* found = request.broker->bft->enumerateInstances(
-        request.broker, request.context, makePath(request, served.name), nullptr, &status);
+    const CMPIBroker* broker = request.broker;
+    const CMPIObjectPath* wanted = makePath(request, served.name);
+    CMPIEnumeration* found =
+        form == Form::names
+            ? broker->bft->enumerateInstanceNames(broker, request.context, wanted, &status)
+            : broker->bft->enumerateInstances(broker, request.context, wanted, nullptr, &status);
     // Without a provider of the class there are no associations with its objects.
     while (status.rc == CMPI_RC_OK && found != nullptr && found->ft->hasNext(found, nullptr) != 0) {
         const CMPIData next = found->ft->getNext(found, &status);
+        if (status.rc != CMPI_RC_OK) {
+            continue;
+        }
+        const CMPIInstance* instance = form == Form::names ? nullptr : next.value.inst;
         auto object =
-            status.rc == CMPI_RC_OK ? withOwnPath(request, next.value.inst) : std::nullopt;
+            withOwnPath(request, instance == nullptr ? next.value.ref : pathOf(instance), instance);
         if (object) {
             objects.push_back(*std::move(object));
         }
@@ -100,7 +108,8 @@ std::optional<Object> askOthersFor(const Request& request, const ServedClass& se
     CMPIStatus status{CMPI_RC_OK, nullptr};
     CMPIInstance* instance =
         request.broker->bft->getInstance(request.broker, request.context, path, nullptr, &status);
-    auto found = status.rc == CMPI_RC_OK ? withOwnPath(request, instance) : std::nullopt;
+    auto found =
+        status.rc == CMPI_RC_OK ? withOwnPath(request, pathOf(instance), instance) : std::nullopt;
     // Some object managers give what the provider delivers, whatever its keys.
     return found && found->keys == Keys(path) ? std::move(found) : std::nullopt;
 }

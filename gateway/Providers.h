@@ -8,7 +8,7 @@
 
 #include "Classes.h"
 #include "Collector.h"
-#include "Keys.h"
+#include "providerutilities/Keys.h"
 
 namespace ZR::DHCPClientGateway {
 
@@ -46,9 +46,10 @@ void askEach(const Request& request, const ServedClass& served, Form form,
 [[nodiscard]] std::vector<Object> ask(const Request& request, const ServedClass& served, Form form,
                                       const KeyTexts& narrowing = {});
 
-/// What other providers have of a class, with instances. Nothing where the object manager
-/// knows no provider for it, or the provider refuses.
-[[nodiscard]] std::vector<Object> askOthers(const Request& request, const ServedClass& served);
+/// What other providers have of a class. Nothing where the object manager knows no provider
+/// for it, or the provider refuses.
+[[nodiscard]] std::vector<Object> askOthers(const Request& request, const ServedClass& served,
+                                            Form form);
 
 /// The one object of another provider that has these keys, with its instance; none where it
 /// does not exist, or the object manager knows no provider.

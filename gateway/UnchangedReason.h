@@ -2,7 +2,7 @@
 
 #include <string>
 
-#include "Refusal.h"
+#include "providerutilities/Refusal.h"
 
 namespace ZR::DHCPClientGateway {
 

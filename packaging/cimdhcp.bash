@@ -5,8 +5,8 @@ _cimdhcp() {
     local options='--tree --data-dir --namespace --format --connect --hosts --parallel --timeout
         --credentials --cacert --insecure --no-header --sort --count --time --color --schema-dir
         --registration-dir --provider-dir --cim-schema --exact --version --help'
-    local commands='show rename graph tree check classes names instances get modify associators
-        references serve user'
+    local commands='show watch rename graph tree check classes names instances get modify
+        associators references serve user profiles'
     # What the program is asked for completions with: the same servers, if there are any.
     local asked=("${COMP_WORDS[0]}")
     local command='' position=0 index
@@ -19,7 +19,7 @@ _cimdhcp() {
                 asked+=("${COMP_WORDS[index]}" "${COMP_WORDS[index + 1]}")
                 ((++index))
                 ;;
-            --tree | --data-dir | --namespace | --format | --hosts | --parallel | --timeout | --sort | --color | --*-dir | --*-class | --role | --result-role | --listen | --tls-* | --users | --max-* | --workers | --io-threads | --*-timeout)
+            --tree | --data-dir | --namespace | --format | --hosts | --parallel | --timeout | --sort | --color | --*-dir | --*-class | --role | --result-role | --listen | --tls-* | --users | --max-* | --workers | --io-threads | --*-timeout | --poll)
                 ((++index))
                 ;;
             -*) ;;
@@ -56,6 +56,8 @@ _cimdhcp() {
             case $command in
                 show) mapfile -t COMPREPLY < <(compgen -W 'system interface dhcp state address
                     servers configuration-name' -- "$word") ;;
+                profiles) mapfile -t COMPREPLY < <(compgen -W 'organization profile version
+                    instances' -- "$word") ;;
                 classes) mapfile -t COMPREPLY < <(compgen -W 'class superclass kind provider' \
                     -- "$word") ;;
                 *) mapfile -t COMPREPLY < <(compgen -W 'PATH' -- "$word") ;;
@@ -77,20 +79,23 @@ _cimdhcp() {
         --assoc-class | --result-class)
             command=names position=0
             ;;
-        --namespace | --role | --result-role | --parallel | --timeout | --listen | --max-* | --workers | --io-threads | --*-timeout)
+        --namespace | --role | --result-role | --parallel | --timeout | --listen | --max-* | --workers | --io-threads | --*-timeout | --poll)
             return
             ;;
     esac
 
     if [[ $word == -* ]]; then
         case $command in
+            watch) options+=' --poll --listen' ;;
             rename) options+=' --create --force' ;;
             graph) options+=' --svg' ;;
             tree) options+=' --explain' ;;
             serve) options+=' --listen --tls-cert --tls-key --users --read-only --max-header-line
                 --max-headers --max-body --max-depth --max-connections --max-waiting --max-stuck
                 --max-result --max-enumerations --workers --io-threads --request-timeout --answer-timeout
-                --enumeration-timeout --max-enumeration-timeout' ;;
+                --enumeration-timeout --max-enumeration-timeout --subscriptions --listener-cacert
+                --max-filters --max-listeners --max-subscriptions --max-queue --delivery-retries
+                --retry-interval --listener-timeout --give-up-after' ;;
             user) options+=' --users --modify' ;;
             associators) options+=' --names --assoc-class --result-class --role --result-role' ;;
             references) options+=' --names --result-class --role' ;;
@@ -105,7 +110,7 @@ _cimdhcp() {
             mapfile -t COMPREPLY < <(compgen -W \
                 "$("${asked[@]}" classes 2>/dev/null | awk 'NR > 1 { print $1 }')" -- "$word")
             ;;
-        rename:0)
+        rename:0 | watch:*)
             mapfile -t COMPREPLY < <(compgen -W \
                 "$("${asked[@]}" names QVXZR_DHCPSettingData 2>/dev/null |
                     sed -n 's/.*InstanceID="[^%]*%\(.*\)"$/\1/p')" -- "$word")

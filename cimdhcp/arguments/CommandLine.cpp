@@ -93,6 +93,37 @@ that is known of them; of one that is asked for, the address is null.
 Exit status: that of every command; notes do not change it.)";
 }
 
+constexpr const char* watchHelp =
+    R"(A line has the time (UTC), with several servers the server, the interface, what was and
+what is:
+
+  2026-11-20T08:15:30Z  eth0  asking -> bound 192.0.2.17 from 192.0.2.1
+  2026-11-20T08:15:30Z  eth0  bound 192.0.2.17 -> 192.0.2.40 from 192.0.2.1
+  2026-11-20T08:15:30Z  eth0  bound 192.0.2.17, renewed until 2026-11-20T12:15:30Z
+
+The states are those of "cimdhcp show --help", "absent" for an interface that is not there,
+and "none" for no lease of an address family when there is one of the other. Leases of IPv4
+and of IPv6 have lines of their own.
+
+With --format json, each line is an object with "time", with several servers "host", and
+"interface", "system", "family", "before" and "after"; the latter have "state", "address",
+"server", "client" and "expires", and are null for an interface that is not there.
+
+Servers tell of changes by indications: the watch leaves subscriptions in their interop
+namespace, for which its user needs the right to write, and listens on a free port of the
+address that a server is reached from. What it leaves is removed at its end; what a run left
+that was killed, by the next run of the same user.
+
+It ends with Ctrl-C or SIGTERM, and then with exit status 0. A server that does not respond
+is told on standard error, and asked again.)";
+
+constexpr const char* profilesHelp =
+    R"(The profiles come from the server's interop namespace. INSTANCES is how many instances
+conform to a profile; "-" where the server does not tell.
+
+With --format json, "namespace" is the interop namespace, and "profiles" has of each profile
+"organization", "name", "version", "id" and "instances"; what is not told is null.)";
+
 constexpr const char* machineGroup = "The machine";
 constexpr const char* classGroup = "Classes and instances";
 constexpr const char* associationGroup = "Associations";
@@ -134,6 +165,7 @@ std::vector<std::string> withEmptyValues(const CLI::App& app,
 /// What is read of each command.
 struct Records {
     ShowCommand show;
+    WatchCommand watch;
     RenameCommand rename;
     GraphCommand graph;
     TreeCommand tree;
@@ -147,6 +179,7 @@ struct Records {
     ServeCommand serve;
     UserAddCommand userAdd;
     CheckCommand check;
+    ProfilesCommand profiles;
 };
 
 }  // namespace
@@ -275,6 +308,7 @@ class CommandLineReader::Parser {
         command("show", machineGroup, "The network interfaces and their DHCP clients",
                 records_.show)
             ->footer(showHelp());
+        addWatch();
         CLI::App* const rename = command(
             "rename", machineGroup, "Change an interface's configuration name", records_.rename);
         rename
@@ -292,6 +326,16 @@ class CommandLineReader::Parser {
             "tree", machineGroup, "What is known of the machine, as a JSON tree", records_.tree);
         tree->add_flag("--explain", records_.tree.explain,
                        "Add where each property came from, and why that counts");
+    }
+
+    void addWatch() {
+        CLI::App* const watch =
+            command("watch", machineGroup, "Each change of interfaces and leases, as it happens",
+                    records_.watch);
+        watch->add_option("INTERFACE", records_.watch.interfaces,
+                          "Interfaces to watch, such as eth0; all of them by default");
+        addWatchOptions(*watch, records_.watch);
+        watch->footer(watchHelp);
     }
 
     void addInstanceCommands() {
@@ -345,6 +389,8 @@ class CommandLineReader::Parser {
         command("check", serverGroup, "Tell why something is empty or does not work",
                 records_.check)
             ->footer(checkHelp);
+        command("profiles", serverGroup, "The profiles that a server advertises", records_.profiles)
+            ->footer(profilesHelp);
         addServeOptions(*serve, records_.serve);
         CLI::App* const user = app_.add_subcommand("user", "The users of the server");
         user->group(serverGroup)->require_subcommand(1);

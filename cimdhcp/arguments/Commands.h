@@ -7,6 +7,7 @@
 #include <variant>
 #include <vector>
 
+#include "indications/SubscriptionSettings.h"
 #include "text/Presentation.h"
 #include "wbem/Limits.h"
 
@@ -54,6 +55,16 @@ struct Options {
 
 struct ShowCommand {
     bool operator==(const ShowCommand&) const = default;
+};
+struct WatchCommand {
+    std::vector<std::string> interfaces;       ///< names; none: all
+    std::optional<std::chrono::seconds> poll;  ///< look so often, without being told of changes
+    std::optional<std::string> listen;         ///< the address where servers tell of changes
+
+    bool operator==(const WatchCommand&) const = default;
+};
+struct ProfilesCommand {
+    bool operator==(const ProfilesCommand&) const = default;
 };
 struct RenameCommand {
     std::string interfaceName;
@@ -123,6 +134,9 @@ struct ServeCommand {
     std::optional<std::string> users;
     bool readOnly = false;
     cimom::wbem::Limits limits;
+    std::optional<std::string> subscriptions;  ///< the directory where they are kept
+    cimom::wbem::DeliverySettings delivery;
+    cimom::wbem::SubscriptionLimits subscriptionLimits;
 
     bool operator==(const ServeCommand&) const = default;
 };
@@ -137,10 +151,10 @@ struct CheckCommand {
     bool operator==(const CheckCommand&) const = default;
 };
 
-using Command =
-    std::variant<ShowCommand, RenameCommand, GraphCommand, TreeCommand, ClassesCommand,
-                 NamesCommand, InstancesCommand, GetCommand, ModifyCommand, AssociatorsCommand,
-                 ReferencesCommand, ServeCommand, UserAddCommand, CheckCommand>;
+using Command = std::variant<ShowCommand, WatchCommand, RenameCommand, GraphCommand, TreeCommand,
+                             ClassesCommand, NamesCommand, InstancesCommand, GetCommand,
+                             ModifyCommand, AssociatorsCommand, ReferencesCommand, ServeCommand,
+                             UserAddCommand, CheckCommand, ProfilesCommand>;
 
 struct CommandLine {
     Options options;

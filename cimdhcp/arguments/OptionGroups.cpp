@@ -51,6 +51,49 @@ void addLimits(CLI::App& app, cimom::wbem::Limits& limits) {
             "The longest such silence that a client may ask for (600)");
 }
 
+constexpr const char* deliveryGroup = "Subscriptions and their listeners";
+
+void addDelivery(CLI::App& app, ServeCommand& serve) {
+    constexpr std::uint32_t mostObjects = 100000;
+    constexpr std::uint32_t longest = 31536000;  // seconds
+    const auto number = [&app](const char* option, auto& value, std::uint32_t least,
+                               const char* text) {
+        app.add_option(option, value, text)
+            ->type_name("N")
+            ->check(CLI::Range(least, mostObjects).description(""))
+            ->group(deliveryGroup);
+    };
+    const auto seconds = [&app](const char* option, std::chrono::milliseconds& value,
+                                const char* text) {
+        app.add_option_function<std::uint32_t>(
+               option,
+               [&value](const std::uint32_t& given) { value = std::chrono::seconds(given); }, text)
+            ->type_name("SECONDS")
+            ->check(CLI::Range(std::uint32_t{1}, longest).description(""))
+            ->group(deliveryGroup);
+    };
+    app.add_option("--subscriptions", serve.subscriptions,
+                   "Where they are kept; /var/lib/dhcp-client-provider/subscriptions")
+        ->type_name("DIR")
+        ->group(deliveryGroup);
+    app.add_option("--listener-cacert", serve.delivery.caCertificates,
+                   "Who vouches for listeners (PEM), not the system's")
+        ->type_name("FILE")
+        ->group(deliveryGroup);
+    number("--max-filters", serve.subscriptionLimits.filters, 1, "Filters of a user (64)");
+    number("--max-listeners", serve.subscriptionLimits.listeners, 1,
+           "Listener destinations of a user (16)");
+    number("--max-subscriptions", serve.subscriptionLimits.subscriptions, 1,
+           "Subscriptions of a user (64)");
+    number("--max-queue", serve.delivery.queued, 1, "Indications that wait for a listener (1000)");
+    number("--delivery-retries", serve.delivery.retries, 0,
+           "How often a delivery is tried again (3)");
+    seconds("--retry-interval", serve.delivery.retryInterval, "The time between attempts (30)");
+    seconds("--listener-timeout", serve.delivery.patience, "For a listener to respond (10)");
+    seconds("--give-up-after", serve.delivery.removalTime,
+            "How long a listener may fail before it is given up (86400)");
+}
+
 }  // namespace
 
 void addRemoteOptions(CLI::App& app, Options& options) {
@@ -107,6 +150,18 @@ void addOutputOptions(CLI::App& app, Options& options) {
         ->group(outputGroup);
 }
 
+void addWatchOptions(CLI::App& app, WatchCommand& watch) {
+    constexpr int longestPause = 86400;
+    app.add_option_function<unsigned>(
+           "--poll", [&watch](const unsigned& given) { watch.poll = std::chrono::seconds(given); },
+           "Look so often, where a server cannot tell of changes")
+        ->type_name("SECONDS")
+        ->check(CLI::Range(1, longestPause).description(""));
+    app.add_option("--listen", watch.listen,
+                   "Where servers tell of changes: an address of this machine")
+        ->type_name("ADDRESS");
+}
+
 void addServeOptions(CLI::App& app, ServeCommand& serve) {
     app.add_option("--listen", serve.listen,
                    "Where to listen; 127.0.0.1 by default. Any address that other "
@@ -122,6 +177,7 @@ void addServeOptions(CLI::App& app, ServeCommand& serve) {
     file("--users", serve.users, "Only these users, made by \"cimdhcp user add\"");
     app.add_flag("--read-only", serve.readOnly, "No client may modify");
     addLimits(app, serve.limits);
+    addDelivery(app, serve);
 }
 
 }  // namespace cimdhcp

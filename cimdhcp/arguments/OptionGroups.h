@@ -8,13 +8,15 @@ class App;
 
 namespace cimdhcp {
 
-// Options that stand together in the help. They are read into `options` and `serve`,
+// Options that stand together in the help. They are read into the records,
 // which must live as long as the parser.
 
 /// Which servers are asked, and how.
 void addRemoteOptions(CLI::App& app, Options& options);
 /// How results are shown.
 void addOutputOptions(CLI::App& app, Options& options);
+/// How the command that watches learns of changes.
+void addWatchOptions(CLI::App& app, WatchCommand& watch);
 /// The command that serves WBEM clients: where it listens, who may send requests, and
 /// what a client may cost.
 void addServeOptions(CLI::App& app, ServeCommand& serve);

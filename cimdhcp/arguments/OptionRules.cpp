@@ -19,12 +19,12 @@ bool isOneOf(const Command& command) noexcept {
 /// Whether the result of the command is a list, which can be sorted and counted.
 bool givesList(const Command& command) noexcept {
     return asksClient(command) &&
-           !isOneOf<RenameCommand, GraphCommand, GetCommand, ModifyCommand>(command);
+           !isOneOf<WatchCommand, RenameCommand, GraphCommand, GetCommand, ModifyCommand>(command);
 }
 
 bool hasMofForm(const Command& command) noexcept {
-    return asksClient(command) &&
-           !isOneOf<ShowCommand, RenameCommand, GraphCommand, ClassesCommand>(command);
+    return asksClient(command) && !isOneOf<ShowCommand, WatchCommand, RenameCommand, GraphCommand,
+                                           ClassesCommand, ProfilesCommand>(command);
 }
 
 [[noreturn]] void refuse(const std::string& reason) {
@@ -76,6 +76,15 @@ void checkFormat(const CommandLine& line) {
     }
 }
 
+void checkWatch(const CommandLine& line) {
+    const auto* const watch = std::get_if<WatchCommand>(&line.command);
+    if (watch != nullptr && watch->listen && (watch->poll || !line.options.remote())) {
+        refuse(
+            "--listen is for servers that tell of changes: with --connect or --hosts, and "
+            "without --poll");
+    }
+}
+
 void checkLimits(const Command& command) {
     if (const auto* const serve = std::get_if<ServeCommand>(&command)) {
         try {
@@ -107,6 +116,7 @@ void completeCommandLine(CommandLine& line) {
         }
     }
     checkLimits(line.command);
+    checkWatch(line);
     checkServers(line);
     if ((options.sort || options.count) && !givesList(line.command)) {
         refuse("the result of this command is not a list: there is nothing to " +

@@ -9,6 +9,9 @@ std::vector<ClassEntry> servedClasses(const std::vector<cimom::Registration>& re
                                       const cimom::ClassRepository& repository) {
     std::vector<ClassEntry> classes;
     for (const cimom::Registration& registration : registrations) {
+        if (!registration.instance && !registration.association) {
+            continue;  // of indications, which have no instances to be asked for
+        }
         const cimom::ClassDeclaration* const declaration = repository.find(registration.className);
         if (declaration == nullptr) {
             continue;  // the object manager has refused such a registration before

@@ -12,7 +12,6 @@
 #include "cimxml/HttpStatus.h"
 #include "cimxml/OperationRequest.h"
 #include "cimxml/OperationResponse.h"
-#include "client/MachineInterfaces.h"
 #include "client/Response.h"
 #include "client/StatusMessage.h"
 #include "text/DisplayText.h"
@@ -29,6 +28,8 @@ namespace http = cimom::wbem::http;
 constexpr std::size_t deepestXml = 64;
 /// The schema of the standard's own classes, none of which an implementation serves.
 constexpr std::string_view standardSchema = "CIM_";
+/// How the names of an object manager's own classes begin, like that of __Namespace.
+constexpr std::string_view systemClass = "__";
 
 [[noreturn]] void fail(const std::string& message) {
     throw Failure(ExitStatus::notLoaded, message);
@@ -40,7 +41,7 @@ std::string excerpt(const std::string& text) {
     return printable(text.size() > shown ? text.substr(0, shown) + "..." : text);
 }
 
-void checkStatus(const HttpResponse& response, const HttpSettings& settings) {
+void checkStatus(const cimom::wbem::ReceivedResponse& response, const HttpSettings& settings) {
     if (response.status == http::ok) {
         return;
     }
@@ -129,7 +130,8 @@ std::vector<ClassEntry> leavesOf(const std::vector<ClassEntry>& classes) {
     }
     std::vector<ClassEntry> leaves;
     for (const ClassEntry& entry : classes) {
-        if (parents.contains(entry.name) || entry.name.starts_with(standardSchema)) {
+        if (parents.contains(entry.name) || entry.name.starts_with(standardSchema) ||
+            entry.name.starts_with(systemClass)) {
             continue;
         }
         leaves.push_back(entry);
@@ -144,6 +146,19 @@ std::vector<ClassEntry> leavesOf(const std::vector<ClassEntry>& classes) {
 
 }  // namespace
 
+Failure failureOf(const cimom::wbem::ConnectionError& error) {
+    using Kind = cimom::wbem::ConnectionError::Kind;
+    std::string message = printable(error.what());
+    if (error.kind == Kind::tooLate) {
+        message += "; --timeout gives it longer";
+    } else if (error.kind == Kind::notTrusted) {
+        message += "; --cacert FILE names who vouches for it";
+    } else if (error.kind == Kind::badCertificates) {
+        message += "; they are those of --cacert";
+    }
+    return {ExitStatus::notLoaded, message};
+}
+
 RemoteClient::RemoteClient(const ServerUrl& url, HttpSettings settings, const Deadline& deadline,
                            std::string nameSpace)
     : Client(std::move(nameSpace)), connection_(url, std::move(settings), deadline) {}
@@ -152,15 +167,15 @@ RemoteClient::~RemoteClient() = default;
 
 OperationResponse RemoteClient::ask(const OperationRequest& request) {
     try {
-        const HttpResponse response = connection_.post(
+        const cimom::wbem::ReceivedResponse response = connection_.post(
             {"Content-Type: application/xml; charset=\"utf-8\"",
              "Accept: application/xml, text/xml", "CIMOperation: MethodCall",
              "CIMMethod: " + request.method(), "CIMObject: " + request.objectHeader()},
             request.body());
         checkStatus(response, connection_.settings());
         return cimom::wbem::readResponse(response.body, request.method(), deepestXml);
-    } catch (const ConnectionError& error) {
-        fail(error.what());
+    } catch (const cimom::wbem::ConnectionError& error) {
+        throw failureOf(error);
     } catch (const cimom::wbem::XmlError& error) {
         fail("the response is not XML: " + excerpt(error.what()));
     } catch (const cimom::wbem::NotValid& error) {
@@ -234,6 +249,18 @@ Response RemoteClient::modify(const cimom::Instance& instance,
         .flag("IncludeQualifiers", false)
         .texts("PropertyList", properties);
     return instancesOf(request);
+}
+
+Response RemoteClient::createInstance(const cimom::Instance& instance) {
+    OperationRequest request("CreateInstance", instance.path.nameSpace);
+    request.instance("NewInstance", instance);
+    return pathsOf(request);
+}
+
+Response RemoteClient::deleteInstance(const cimom::ObjectPath& path) {
+    OperationRequest request("DeleteInstance", path.nameSpace);
+    request.instanceName("InstanceName", path);
+    return pathsOf(request);
 }
 
 Response RemoteClient::associatorNames(const cimom::ObjectPath& path,
@@ -313,18 +340,6 @@ std::vector<ClassEntry> RemoteClient::servedClasses() {
 
 bool RemoteClient::mayServe(std::string_view /*className*/) const {
     return true;
-}
-
-MachineInterfaces RemoteClient::interfaces(const ServedInstances& served) {
-    const std::vector<cimom::Instance> nothing;
-    const auto endpoints = instancesIn("QVXZR_IPProtocolEndpoint");
-    // A server without the class has no service processor to tell of.
-    const Response systems = enumerateNames(classPath("QVXZR_SPComputerSystem"));
-    std::vector<std::string> processors;
-    for (const auto& path : systems.paths) {
-        processors.push_back(heldText(path->key("Name")));
-    }
-    return {interfacesOf(served.settings ? *served.settings : nothing, endpoints, processors), {}};
 }
 
 std::optional<std::string> RemoteClient::dataDir() const {

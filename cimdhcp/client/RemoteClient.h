@@ -6,7 +6,8 @@
 #include <vector>
 
 #include "client/Client.h"
-#include "client/HttpConnection.h"
+#include "client/ServerUrl.h"
+#include "transport/HttpConnection.h"
 
 namespace cimom::wbem {
 class OperationRequest;
@@ -14,6 +15,12 @@ struct OperationResponse;
 }  // namespace cimom::wbem
 
 namespace cimdhcp {
+
+using cimom::wbem::Deadline;
+using cimom::wbem::HttpSettings;
+
+/// A server that could not be reached, with a remedy where there is one.
+[[nodiscard]] Failure failureOf(const cimom::wbem::ConnectionError& error);
 
 /// A WBEM server, reached with CIM-XML over HTTP (DSP0200, DSP0201). A server that cannot
 /// be reached, or whose response cannot be understood, is a Failure with
@@ -34,7 +41,6 @@ class RemoteClient : public Client {
     /// Always true: only a response tells.
     [[nodiscard]] bool mayServe(std::string_view className) const override;
     /// What the interfaces' settings and IP endpoints tell.
-    [[nodiscard]] MachineInterfaces interfaces(const ServedInstances& served) override;
     [[nodiscard]] std::optional<std::string> dataDir() const override;
 
     Response enumerateNames(const cimom::ObjectPath& path) override;
@@ -42,6 +48,9 @@ class RemoteClient : public Client {
     Response get(const cimom::ObjectPath& path) override;
     Response modify(const cimom::Instance& instance,
                     const std::vector<std::string>& properties) override;
+    /// The response has the path of what was created.
+    Response createInstance(const cimom::Instance& instance);
+    Response deleteInstance(const cimom::ObjectPath& path);
     Response associatorNames(const cimom::ObjectPath& path,
                              const cimom::AssociationRequest& request) override;
     Response associators(const cimom::ObjectPath& path,
@@ -62,7 +71,7 @@ class RemoteClient : public Client {
     Response instancesOf(const cimom::wbem::OperationRequest& request);
     const cimom::ClassDeclaration* findClass(std::string_view className);
 
-    HttpConnection connection_;
+    cimom::wbem::HttpConnection connection_;
     /// By the name that was asked for; null: the server does not know the class.
     std::unordered_map<std::string, std::unique_ptr<const cimom::ClassDeclaration>> classes_;
 };

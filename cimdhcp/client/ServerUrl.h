@@ -1,24 +1,16 @@
 #pragma once
 
-#include <cstdint>
 #include <istream>
 #include <string>
 #include <vector>
 
+#include "transport/HttpUrl.h"
+
 namespace cimdhcp {
 
-/// Where a WBEM server is.
-struct ServerUrl {
+/// Where a WBEM server is, as a person says it.
+struct ServerUrl : cimom::wbem::HttpUrl {
     std::string given;  ///< as the person wrote it
-    bool encrypted = true;
-    std::string host;  ///< a name or an address, an IPv6 address without brackets
-    std::uint16_t port = 0;
-    std::string path;  ///< with the leading slash
-
-    /// "https://host:5989/cimom"
-    [[nodiscard]] std::string text() const;
-    /// Whether it is on this machine, where no one can listen on the way.
-    [[nodiscard]] bool isHere() const;
 
     bool operator==(const ServerUrl&) const = default;
 };

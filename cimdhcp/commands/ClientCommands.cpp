@@ -13,6 +13,8 @@
 #include "commands/Graph.h"
 #include "commands/GraphDrawing.h"
 #include "commands/Overview.h"
+#include "commands/PlatformSetup.h"
+#include "commands/Profiles.h"
 #include "commands/Rename.h"
 #include "commands/ResponseOrder.h"
 #include "commands/ResponseText.h"
@@ -32,9 +34,9 @@ class Execution {
         : client_(client), presentation_(presentation) {}
 
     Outcome operator()(const ShowCommand& /*command*/) const {
-        const ServedInstances served = askProvider(client_);
-        MachineInterfaces machine = client_.interfaces(served);
-        addServed(served, machine.interfaces);
+        // Those of a tree are told by the name that a person gave it.
+        MachineInterfaces machine =
+            askMachine(client_, treeName().empty() ? AskDiagnostics::Yes : AskDiagnostics::No);
         const std::int64_t now = presentation_.now;
         std::string diagnostics = diagnosticText(machine.diagnostics, machine.interfaces);
         if (!presentation_.count) {
@@ -53,6 +55,15 @@ class Execution {
     Outcome operator()(const ClassesCommand& /*command*/) const {
         return {list(classColumns(), client_.servedClasses(), classTable, classJson), "",
                 std::nullopt};
+    }
+
+    Outcome operator()(const ProfilesCommand& /*command*/) const {
+        Profiles read = readProfiles(client_);
+        return {list(profileColumns(), std::move(read.profiles), profileTable,
+                     [&read](const std::vector<Profile>& profiles) {
+                         return profileJson(read.nameSpace, profiles);
+                     }),
+                "", std::nullopt};
     }
 
     Outcome operator()(const RenameCommand& command) const {
@@ -78,8 +89,8 @@ class Execution {
 
     template <typename Kind>
     Outcome operator()(const Kind& command) const {
-        if constexpr (isOneOf<Kind, TreeCommand, ServeCommand, UserAddCommand>) {
-            throw Failure(ExitStatus::usage, "this command is about this machine alone");
+        if constexpr (isOneOf<Kind, TreeCommand, ServeCommand, UserAddCommand, WatchCommand>) {
+            throw Failure(ExitStatus::usage, "this command does not ask one server once");
         } else {
             CimOperation operation = cimdhcp::carryOut(command, client_);
             if (presentation_.sort) {

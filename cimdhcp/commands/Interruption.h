@@ -3,6 +3,8 @@
 #include <atomic>
 #include <csignal>
 
+#include "zrcommon/UniqueFd.h"
+
 namespace cimdhcp {
 
 /// While it exists, the first SIGINT or SIGTERM only sets wanted(), and the second one
@@ -16,7 +18,11 @@ class Interruption {
 
     [[nodiscard]] const std::atomic<bool>& wanted() const noexcept;
 
+    /// Can be read from poll(2)'s point of view as soon as wanted() is true.
+    [[nodiscard]] int descriptor() const noexcept { return descriptor_.get(); }
+
   private:
+    ZR::UniqueFd descriptor_;
     struct ::sigaction beforeInterrupt_ {};
     struct ::sigaction beforeTermination_ {};
 };

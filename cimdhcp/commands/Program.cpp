@@ -19,6 +19,7 @@
 #include "commands/RemoteRun.h"
 #include "commands/Serve.h"
 #include "commands/UserAdd.h"
+#include "commands/Watch.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
 #include "text/Presentation.h"
@@ -33,14 +34,9 @@ namespace cimdhcp {
 
 namespace {
 
-/// How long the service processor may take.
-constexpr std::chrono::seconds patience(1);
-
 std::unique_ptr<EmbeddedClient> openClient(const Options& options) {
-    auto client = std::make_unique<EmbeddedClient>(
+    return std::make_unique<EmbeddedClient>(
         findDirectories(options, installations(executableFile())), options.nameSpace);
-    client->awaitServiceProcessor(patience);
-    return client;
 }
 
 /// Runs one command line on this machine.
@@ -58,7 +54,6 @@ class Execution {
             }
             service.useSource(ZR::openLiveSource(ZR::Explain::Yes));
         }
-        service.settle(patience);
         const auto snapshot = service.current();
         outputs_.out << ZR::toJson(*snapshot, ZR::getSystemName());
         tell(*snapshot);
@@ -79,15 +74,19 @@ class Execution {
         }
     }
 
+    void operator()(const WatchCommand& command) const {
+        tellOfTree();
+        const auto client = openClient(line_.options);
+        watchMachine(command, *client, presentation_, outputs_);
+    }
+
     void operator()(const UserAddCommand& command) const {
         addUser(command, outputs_.out, outputs_.err);
     }
 
     template <typename ClientCommand>
     void operator()(const ClientCommand& /*command*/) const {
-        if constexpr (!std::is_same_v<ClientCommand, ShowCommand>) {
-            tellOfTree();  // "show" has it with what else it tells of the machine
-        }
+        tellOfTree();
         const auto client = openClient(line_.options);
         const Outcome outcome = carryOut(line_.command, *client, presentation_);
         outputs_.out << outcome.text;
@@ -116,11 +115,6 @@ class Execution {
     const Outputs& outputs_;
 };
 
-std::int64_t secondsNow() {
-    const auto now = std::chrono::system_clock::now().time_since_epoch();
-    return std::chrono::floor<std::chrono::seconds>(now).count();
-}
-
 Style styleFor(const Options& options, bool terminal) {
     return {!options.noHeader,
             wantsColor(options.color, terminal, std::getenv("NO_COLOR"), std::getenv("TERM"))};
@@ -142,6 +136,11 @@ Presentation presentationOf(const CommandLine& line, const Outputs& outputs) {
 
 ExitStatus runLine(const CommandLine& line, const Outputs& outputs, const Style& errorStyle) {
     const Presentation presentation = presentationOf(line, outputs);
+    const auto* const watch = std::get_if<WatchCommand>(&line.command);
+    if (line.options.remote() && watch != nullptr) {
+        watchServers(*watch, line.options, presentation, outputs);
+        return ExitStatus::ok;
+    }
     if (line.options.remote()) {
         return runRemotely(line, presentation, outputs, errorStyle);
     }

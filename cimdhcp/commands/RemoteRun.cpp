@@ -1,87 +1,15 @@
 #include "commands/RemoteRun.h"
 
-#include <cerrno>
-#include <cstring>
 #include <ostream>
-#include <utility>
 
-#include "client/Credentials.h"
-#include "client/RemoteClient.h"
 #include "commands/ClientCommands.h"
 #include "commands/Fleet.h"
 #include "commands/FleetOutput.h"
 #include "commands/Interruption.h"
+#include "commands/ServerAccess.h"
 #include "text/DisplayText.h"
-#include "zrcommon/File.h"
 
 namespace cimdhcp {
-
-namespace {
-
-/// Carries the command out on servers, as the options say. Safe for concurrent use.
-class Asker {
-  public:
-    Asker(const CommandLine& line, const Presentation& presentation,
-          const std::atomic<bool>& interrupted)
-        : line_(line), presentation_(presentation) {
-        const Options& options = line.options;
-        settings_.caCertificates = options.caCertificate;
-        settings_.insecure = options.insecure;
-        settings_.interrupted = &interrupted;
-        if (options.caCertificate && !ZR::File::read(*options.caCertificate)) {
-            throw Failure(ExitStatus::notLoaded,
-                          printable(*options.caCertificate) + ": " + std::strerror(errno));
-        }
-        if (options.credentials) {
-            credentials_ = readCredentials(*options.credentials);
-        }
-    }
-
-    Outcome operator()(const ServerUrl& server) const {
-        try {
-            RemoteClient client(server, settingsFor(server), Deadline(line_.options.timeout),
-                                line_.options.nameSpace);
-            return carryOut(line_.command, client, presentation_);
-        } catch (const ConnectionError& error) {
-            throw Failure(ExitStatus::notLoaded, error.what());
-        }
-    }
-
-  private:
-    [[nodiscard]] HttpSettings settingsFor(const ServerUrl& server) const {
-        HttpSettings settings = settings_;
-        const Credential* const credential = credentialFor(credentials_, server.host, server.port);
-        if (credential != nullptr) {
-            if (!server.encrypted && !server.isHere() && !settings.insecure) {
-                throw Failure(ExitStatus::notLoaded,
-                              "the password could be read on the way over http; use https, or "
-                              "--insecure if no one can listen");
-            }
-            settings.credential = *credential;
-        }
-        return settings;
-    }
-
-    const CommandLine& line_;
-    const Presentation& presentation_;
-    HttpSettings settings_;
-    std::vector<Credential> credentials_;
-};
-
-std::vector<ServerUrl> serversOf(const Options& options) {
-    std::vector<ServerUrl> servers;
-    for (const std::string& text : options.connect) {
-        servers.push_back(readServerUrl(text));
-    }
-    if (options.hosts) {
-        for (ServerUrl& server : readServersFile(*options.hosts)) {
-            servers.push_back(std::move(server));
-        }
-    }
-    return servers;
-}
-
-}  // namespace
 
 ExitStatus runRemotely(const CommandLine& line, const Presentation& presentation,
                        const Outputs& outputs, const Style& errorStyle) {
@@ -91,12 +19,17 @@ ExitStatus runRemotely(const CommandLine& line, const Presentation& presentation
     if (several && graph != nullptr && graph->svg) {
         throw Failure(ExitStatus::usage, "--svg draws one machine; ask one server at a time");
     }
-    if (line.options.insecure) {
-        outputs.err << "cimdhcp: warning: --insecure: the identity of the servers is not checked, "
-                       "and passwords may be sent unencrypted\n";
-    }
+    warnOfInsecurity(line.options, outputs.err);
     const Interruption interruption;
-    const Asker ask(line, presentation, interruption.wanted());
+    const ServerAccess access(line.options, interruption.wanted());
+    const auto ask = [&](const ServerUrl& server) {
+        try {
+            RemoteClient client = access.clientOf(server);
+            return carryOut(line.command, client, presentation);
+        } catch (const cimom::wbem::ConnectionError& error) {
+            throw failureOf(error);
+        }
+    };
     if (!several) {
         Outcome outcome;
         try {

@@ -9,6 +9,7 @@
 #include <cstdint>
 #include <cstring>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 #include "commands/RenameRefusals.h"
@@ -99,18 +100,8 @@ void endLastLine(const std::string& path) {
 }
 
 std::string whyUnchanged(const std::string& path) {
-    struct stat status {};
-    if (::stat(path.c_str(), &status) != 0) {
-        return path + ": " + std::strerror(errno);
-    }
-    if (!S_ISREG(status.st_mode)) {
-        return path + " is not a regular file";
-    }
-    for (const int access : {R_OK, W_OK}) {
-        if (::access(path.c_str(), access) != 0) {
-            return path + " cannot be " + (access == R_OK ? "read" : "written") + ": " +
-                   std::strerror(errno);
-        }
+    if (auto obstacle = ZR::InterfaceFile::obstacle(path)) {
+        return std::move(obstacle->text);
     }
     return path + " was not changed; the system log may tell why";
 }

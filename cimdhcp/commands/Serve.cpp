@@ -1,18 +1,28 @@
 #include "commands/Serve.h"
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <charconv>
 #include <chrono>
 #include <condition_variable>
 #include <csignal>
+#include <cstdint>
 #include <cstdlib>
 #include <cstring>
+#include <filesystem>
+#include <memory>
 #include <mutex>
 #include <optional>
+#include <string>
 #include <system_error>
 #include <thread>
+#include <utility>
+#include <vector>
 
+#include "cimom/Interop.h"
+#include "cimom/ObjectManager.h"
+#include "indications/Subscriptions.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
 #include "tklogger/TKLogger.h"
@@ -53,6 +63,26 @@ cimom::wbem::ServerSettings settingsOf(const ServeCommand& command) {
     return settings;
 }
 
+/// What the interop namespace tells of the server.
+cimom::CommunicationMechanism communicationMechanism(const cimom::wbem::ServerSettings& settings) {
+    // Numbers of the value maps of CIM_ObjectManagerCommunicationMechanism.
+    constexpr std::uint16_t cimXml = 2;
+    constexpr std::uint16_t noAuthentication = 2;
+    constexpr std::uint16_t basicAuthentication = 3;
+    // Basic read, association traversal, query execution; of these, pulled.
+    std::vector<std::uint16_t> operations{2, 6, 7, 10, 11, 12};
+    if (!settings.readOnly) {
+        // Basic write and instance manipulation.
+        operations.insert(operations.end(), {3, 5});
+    }
+    return {"CIM-XML",
+            std::string("CIM-XML over ") + (settings.tls ? "HTTPS" : "HTTP"),
+            cimXml,
+            "1.0",
+            std::move(operations),
+            {settings.users ? basicAuthentication : noAuthentication}};
+}
+
 /// Notices and failures are kept by default; lines about each request,
 /// which only help to find a fault, are not.
 void log(cimom::wbem::LogKind kind, const std::string& message) {
@@ -61,6 +91,49 @@ void log(cimom::wbem::LogKind kind, const std::string& message) {
         "cimdhcp/Serve", "log", __LINE__, category,
         kind == cimom::wbem::LogKind::request ? ZR::LogLevel::flow : ZR::LogLevel::failure, nullptr,
         0, 0, message);
+}
+
+/// Where subscriptions are kept when the command line does not say it.
+std::filesystem::path standardDirectory() {
+    // As systemd says it to a service with StateDirectory=, of which the first counts.
+    const char* const given = std::getenv("STATE_DIRECTORY");
+    const std::string first =
+        given == nullptr ? "" : std::string(given).substr(0, std::string_view(given).find(':'));
+    return first.empty() ? "/var/lib/dhcp-client-provider/subscriptions" : first;
+}
+
+/// The subscriptions of clients. Without a directory that was asked for and can be used, they
+/// last as long as the server.
+std::unique_ptr<cimom::wbem::Subscriptions> subscriptionsOf(
+    const ServeCommand& command, const std::optional<std::vector<cimom::wbem::User>>& users,
+    cimom::ObjectManager& manager) {
+    cimom::wbem::SubscriptionSettings settings;
+    settings.directory =
+        command.subscriptions ? std::filesystem::path(*command.subscriptions) : standardDirectory();
+    settings.delivery = command.delivery;
+    settings.limits = command.subscriptionLimits;
+    if (command.delivery.caCertificates) {
+        static_cast<void>(pemText(*command.delivery.caCertificates));
+    }
+    if (users) {
+        settings.isUser = [users](const std::string& name) {
+            return std::any_of(users->begin(), users->end(),
+                               [&name](const auto& user) { return user.name == name; });
+        };
+    }
+    const auto tell = [](const std::string& line) { log(cimom::wbem::LogKind::failure, line); };
+    try {
+        return std::make_unique<cimom::wbem::Subscriptions>(manager, manager.indications(),
+                                                            settings, tell);
+    } catch (const std::system_error& error) {
+        if (command.subscriptions) {
+            throw Failure(ExitStatus::notLoaded, printable(error.what()));
+        }
+        tell(std::string("subscriptions end with the server: ") + error.what());
+    }
+    settings.directory.clear();
+    return std::make_unique<cimom::wbem::Subscriptions>(manager, manager.indications(), settings,
+                                                        tell);
 }
 
 /// The signals that end the server, as sigwait wants them: blocked in all threads,
@@ -150,7 +223,11 @@ void serve(const ServeCommand& command, cimom::ObjectManager& manager, std::ostr
         // Shorter than service managers wait before they kill.
         constexpr std::chrono::seconds patience(5);
         std::optional<EndInTime> end;
-        cimom::wbem::Server server(manager, settingsOf(command), log);
+        cimom::wbem::ServerSettings settings = settingsOf(command);
+        cimom::serveInterop(manager,
+                            {"cimdhcp", CIMDHCP_VERSION, {communicationMechanism(settings)}});
+        const auto subscriptions = subscriptionsOf(command, settings.users, manager);
+        cimom::wbem::Server server(manager, std::move(settings), log);
         log(cimom::wbem::LogKind::notice, "listening on " + server.url());
         out << "Listening on " << server.url() << std::endl;
         int signal = 0;

@@ -1,9 +1,11 @@
 #include "text/Terminal.h"
 
+#include <langinfo.h>
 #include <sys/ioctl.h>
 #include <unistd.h>
 
 #include <charconv>
+#include <clocale>
 #include <string_view>
 
 namespace cimdhcp {
@@ -29,6 +31,17 @@ std::optional<std::size_t> terminalWidth(int descriptor, const char* columns) {
         return size.ws_col;
     }
     return usualWidth;
+}
+
+bool showsUtf8() {
+    // A locale of its own: that of the process stays "C", so that numbers look the same.
+    const locale_t locale = ::newlocale(LC_CTYPE_MASK, "", nullptr);
+    if (locale == nullptr) {
+        return false;  // there is no such locale
+    }
+    const bool utf8 = std::string_view(::nl_langinfo_l(CODESET, locale)) == "UTF-8";
+    ::freelocale(locale);
+    return utf8;
 }
 
 }  // namespace cimdhcp

@@ -11,4 +11,7 @@ namespace cimdhcp {
 /// terminal says, then 80.
 [[nodiscard]] std::optional<std::size_t> terminalWidth(int descriptor, const char* columns);
 
+/// Whether the environment's locale has UTF-8, so that characters beyond ASCII can be shown.
+[[nodiscard]] bool showsUtf8();
+
 }  // namespace cimdhcp

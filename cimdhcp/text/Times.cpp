@@ -23,6 +23,11 @@ constexpr std::int64_t lastMoment = 253'402'300'799;  // 9999-12-31T23:59:59Z
 
 }  // namespace
 
+std::int64_t secondsNow() {
+    const auto now = std::chrono::system_clock::now().time_since_epoch();
+    return std::chrono::floor<std::chrono::seconds>(now).count();
+}
+
 std::string durationText(std::chrono::duration<double> duration) {
     using std::chrono::milliseconds;
     const auto whole = std::max(std::chrono::round<milliseconds>(duration), milliseconds::zero());

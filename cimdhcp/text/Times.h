@@ -6,6 +6,9 @@
 
 namespace cimdhcp {
 
+/// Since the epoch.
+[[nodiscard]] std::int64_t secondsNow();
+
 /// "0.123 s"
 [[nodiscard]] std::string durationText(std::chrono::duration<double> duration);
 

@@ -7,9 +7,11 @@
 
 namespace cimom::broker {
 
-Broker::Broker(const ClassRepository& classes, RequestHandler* handler) noexcept
+Broker::Broker(const ClassRepository& classes, RequestHandler* handler,
+               IndicationSink* sink) noexcept
     : classes_(&classes),
       handler_(handler),
+      sink_(sink),
       record_{this, &brokerTable, &encapsulationTable, &threadTable, &memoryTable} {}
 
 Broker::~Broker() = default;

@@ -11,14 +11,17 @@
 
 namespace cimom::broker {
 
+class IndicationSink;
+
 /// The CMPI broker as one provider library sees it. Its record is what the
 /// factories get; it must live until the library's last function returned.
 /// Safe for concurrent use.
 class Broker {
   public:
-    /// Classes and handler must outlive the broker. Without a handler, a provider's
-    /// requests to other providers are not supported.
-    explicit Broker(const ClassRepository& classes, RequestHandler* handler = nullptr) noexcept;
+    /// Classes, handler and sink must outlive the broker. Without a handler, a provider's
+    /// requests to other providers are not supported; without a sink, its indications are not.
+    explicit Broker(const ClassRepository& classes, RequestHandler* handler = nullptr,
+                    IndicationSink* sink = nullptr) noexcept;
     ~Broker();
     Broker(const Broker&) = delete;
     Broker& operator=(const Broker&) = delete;
@@ -29,6 +32,7 @@ class Broker {
 
     [[nodiscard]] const ClassRepository& classes() const noexcept { return *classes_; }
     [[nodiscard]] RequestHandler* handler() const noexcept { return handler_; }
+    [[nodiscard]] IndicationSink* sink() const noexcept { return sink_; }
     [[nodiscard]] MemoryPool& memory() noexcept { return memory_; }
 
     /// A copy of the context for a thread of the provider; owned by the broker
@@ -50,6 +54,7 @@ class Broker {
 
     const ClassRepository* classes_;
     RequestHandler* handler_;
+    IndicationSink* sink_;
     CMPIBroker record_;
     MemoryPool memory_;
     std::mutex mutex_;

@@ -12,6 +12,7 @@
 #include "broker/objects/BrokerInstance.h"
 #include "broker/objects/BrokerObjectPath.h"
 #include "broker/objects/BrokerResult.h"
+#include "broker/objects/BrokerSelectExp.h"
 #include "cimom/ObjectPath.h"
 #include "cimom/ObjectPathText.h"
 
@@ -72,12 +73,12 @@ std::string_view kindOf(const void* object) noexcept {
         std::string_view name;
     };
     const Kind kinds[] = {
-        {&instanceTable, "CMPIInstance"}, {&objectPathTable, "CMPIObjectPath"},
-        {&stringTable, "CMPIString"},     {&arrayTable, "CMPIArray"},
-        {&dateTimeTable, "CMPIDateTime"}, {&argsTable, "CMPIArgs"},
-        {&contextTable, "CMPIContext"},   {&enumerationTable, "CMPIEnumeration"},
-        {&resultTable, "CMPIResult"},     {&errorTable, "CMPIError"},
-        {&brokerTable, "CMPIBroker"},
+        {&instanceTable, "CMPIInstance"},   {&objectPathTable, "CMPIObjectPath"},
+        {&stringTable, "CMPIString"},       {&arrayTable, "CMPIArray"},
+        {&dateTimeTable, "CMPIDateTime"},   {&argsTable, "CMPIArgs"},
+        {&contextTable, "CMPIContext"},     {&enumerationTable, "CMPIEnumeration"},
+        {&resultTable, "CMPIResult"},       {&errorTable, "CMPIError"},
+        {&selectExpTable, "CMPISelectExp"}, {&brokerTable, "CMPIBroker"},
     };
     for (const Kind& kind : kinds) {
         if (kind.table == table) {

@@ -4,6 +4,7 @@
 
 #include "broker/Broker.h"
 #include "broker/Conversion.h"
+#include "broker/IndicationSink.h"
 #include "broker/RequestScope.h"
 #include "broker/objects/BrokerContext.h"
 #include "broker/objects/BrokerEnumeration.h"
@@ -22,9 +23,10 @@ namespace {
 
 /// What this host really does: reading and traversing; properties are written by
 /// modifyInstance only, nothing is created or deleted.
-constexpr unsigned capabilities =
-    CMPI_MB_BasicRead | CMPI_MB_AssociationTraversal | CMPI_MB_OSEncapsulationSupport |
-    CMPI_MB_Supports_MemEnhancements | CMPI_MB_Supports_Extended_Error;
+constexpr unsigned capabilities = CMPI_MB_BasicRead | CMPI_MB_AssociationTraversal |
+                                  CMPI_MB_Indications | CMPI_MB_OSEncapsulationSupport |
+                                  CMPI_MB_Supports_MemEnhancements |
+                                  CMPI_MB_Supports_Extended_Error;
 
 CMPIContext* prepareAttachThread(const CMPIBroker* mb, const CMPIContext* context) {
     return guarded<CMPIContext*>(nullptr, nullptr, [=](CMPIrc&) -> CMPIContext* {
@@ -288,12 +290,27 @@ CMPIEnumeration* referenceNames(const CMPIBroker* mb, const CMPIContext* context
         });
 }
 
-// What this host has no meaning for.
-
-CMPIStatus deliverIndication(const CMPIBroker*, const CMPIContext*, const char*,
-                             const CMPIInstance*) {
-    return statusOf(CMPI_RC_ERR_NOT_SUPPORTED);
+/// The context is not looked at: some providers deliver with one whose request has ended.
+CMPIStatus deliverIndication(const CMPIBroker* mb, const CMPIContext*, const char* nameSpace,
+                             const CMPIInstance* indication) {
+    return guarded([=] {
+        const Broker* const broker = Broker::of(mb);
+        const InstanceRecord* const record = instanceOf(indication);
+        if (broker == nullptr || record == nullptr) {
+            return broker == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_ERR_INVALID_PARAMETER;
+        }
+        if (broker->sink() == nullptr) {
+            return CMPI_RC_ERR_NOT_SUPPORTED;
+        }
+        Instance copy = toModel(*record);
+        if (copy.path.nameSpace.empty() && nameSpace != nullptr) {
+            copy.path.nameSpace = nameSpace;
+        }
+        return broker->sink()->take(*broker, std::move(copy));
+    });
 }
+
+// What this host has no meaning for.
 
 CMPIObjectPath* createInstance(const CMPIBroker*, const CMPIContext*, const CMPIObjectPath*,
                                const CMPIInstance*, CMPIStatus* rc) {

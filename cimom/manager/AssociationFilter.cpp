@@ -77,24 +77,33 @@ bool playsRole(const Instance& association, const ObjectPath& object,
     });
 }
 
+std::vector<ObjectPath> otherEnds(const Instance& association, const ObjectPath& source,
+                                  const std::optional<std::string>& role,
+                                  const std::optional<std::string>& resultRole,
+                                  const ClassRepository& repository) {
+    const std::vector<End> ends = endsOf(association);
+    std::vector<ObjectPath> others;
+    for (const End& far : ends) {
+        const bool connected = std::any_of(ends.begin(), ends.end(), [&](const End& near) {
+            return &near != &far && hasRole(near, role) &&
+                   sameObject(*near.object, source, repository);
+        });
+        if (connected && hasRole(far, resultRole)) {
+            others.push_back(*far.object);
+        }
+    }
+    return others;
+}
+
 bool connects(const std::vector<Instance>& associations, const ObjectPath& source,
               const ObjectPath& other, const std::optional<std::string>& role,
               const std::optional<std::string>& resultRole, const ClassRepository& repository) {
-    for (const Instance& association : associations) {
-        const std::vector<End> ends = endsOf(association);
-        for (const End& near : ends) {
-            if (!hasRole(near, role) || !sameObject(*near.object, source, repository)) {
-                continue;
-            }
-            for (const End& far : ends) {
-                if (&far != &near && hasRole(far, resultRole) &&
-                    sameObject(*far.object, other, repository)) {
-                    return true;
-                }
-            }
-        }
-    }
-    return false;
+    return std::any_of(associations.begin(), associations.end(), [&](const Instance& association) {
+        const auto others = otherEnds(association, source, role, resultRole, repository);
+        return std::any_of(others.begin(), others.end(), [&](const ObjectPath& each) {
+            return sameObject(each, other, repository);
+        });
+    });
 }
 
 bool canConnect(const ClassDeclaration& association, const std::optional<std::string>& sourceClass,

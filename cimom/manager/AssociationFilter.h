@@ -21,6 +21,14 @@ namespace cimom {
                              const std::optional<std::string>& role,
                              const ClassRepository& repository);
 
+/// The objects that the association connects the source to, the source playing `role`, the
+/// others `resultRole`.
+[[nodiscard]] std::vector<ObjectPath> otherEnds(const Instance& association,
+                                                const ObjectPath& source,
+                                                const std::optional<std::string>& role,
+                                                const std::optional<std::string>& resultRole,
+                                                const ClassRepository& repository);
+
 /// Whether one of the associations connects the two objects, the source playing
 /// `role`, the other `resultRole`, by two different references.
 [[nodiscard]] bool connects(const std::vector<Instance>& associations, const ObjectPath& source,

@@ -27,11 +27,14 @@ const ObjectPath& pathOf(const Instance& instance) noexcept {
     return instance.path;
 }
 
-/// The classes of each provider, in the order of the first.
+/// The classes of each provider, in the order of the first, without own ones.
 std::vector<std::pair<Provider*, std::vector<const ServedClass*>>> byProvider(
     const std::vector<const ServedClass*>& classes) {
     std::vector<std::pair<Provider*, std::vector<const ServedClass*>>> found;
     for (const ServedClass* const one : classes) {
+        if (one->own != nullptr) {
+            continue;
+        }
         auto entry =
             std::ranges::find(found, one->provider, [](const auto& each) { return each.first; });
         if (entry == found.end()) {
@@ -238,8 +241,45 @@ RequestEnd ObjectManager::Implementation::associated(ObjectPath path,
                 }
             }
         }
+        for (const ServedClass* const one : associations.classes) {
+            if (one->own != nullptr) {
+                calls.push_back(associatedByOwn(*one, path, request, receiver));
+            }
+        }
         return endOfAssociations(calls, associations.exact);
     });
+}
+
+template <typename Object>
+CallOutcome ObjectManager::Implementation::associatedByOwn(const ServedClass& target,
+                                                           const ObjectPath& source,
+                                                           const AssociationRequest& request,
+                                                           ResultReceiver<Object>& receiver) {
+    std::vector<Instance> associations;
+    CallOutcome outcome = ownAssociations(target, source, request.role, associations);
+    if (!outcome.status.ok()) {
+        return outcome;
+    }
+    RequestedObjects<Object> requested(receiver, surroundings(source), request.propertyList);
+    requested.beginCall();
+    for (const Instance& association : associations) {
+        for (const ObjectPath& other :
+             otherEnds(association, source, request.role, request.resultRole, repository_)) {
+            if (!isOfClass(other.className, request.resultClass, repository_)) {
+                continue;
+            }
+            if constexpr (std::is_same_v<Object, ObjectPath>) {
+                requested.take(other);
+            } else {
+                // An end that is gone meanwhile is not associated any more.
+                InstancesResult found = getInstance(other, {std::nullopt, request.principal});
+                if (found.status.ok() && !found.instances.empty()) {
+                    requested.take(std::move(found.instances.front()));
+                }
+            }
+        }
+    }
+    return outcome;
 }
 
 /// Providers know their association classes by their exact names.
@@ -260,6 +300,19 @@ RequestEnd ObjectManager::Implementation::referring(ObjectPath path,
         const Associations associations = associationsOf(path, request.resultClass, request);
         std::vector<CallOutcome> calls;
         for (const ServedClass* const one : associations.classes) {
+            if (one->own != nullptr) {
+                std::vector<Instance> own;
+                calls.push_back(ownAssociations(*one, path, request.role, own));
+                requested.beginCall();
+                for (Instance& association : own) {
+                    if constexpr (std::is_same_v<Object, ObjectPath>) {
+                        requested.take(std::move(association.path));
+                    } else {
+                        requested.take(std::move(association));
+                    }
+                }
+                continue;
+            }
             calls.push_back(noted(
                 *one->provider, path,
                 callReferences(*one->provider, path, one->declaration->name, request, &requested)));

@@ -47,11 +47,15 @@ ObjectManager::Implementation::Implementation(ObjectManager& manager, Configurat
         auto read = readRegistrations(file);
         std::move(read.begin(), read.end(), std::back_inserter(registrations_));
     }
-    providers_.emplace(configuration_.providerDirectories, repository_, &manager);
-    served_.reserve(registrations_.size());
+    providers_.emplace(configuration_.providerDirectories, repository_, &manager, &filters_);
     for (const Registration& registration : registrations_) {
         serve(registration);
     }
+    orderAssociations();
+}
+
+void ObjectManager::Implementation::orderAssociations() {
+    associations_.clear();
     for (const ClassDeclaration* const declaration : repository_.classes()) {
         if (const auto entry = servedByName_.find(declaration->name);
             entry != servedByName_.end()) {
@@ -64,6 +68,10 @@ ObjectManager::Implementation::Implementation(ObjectManager& manager, Configurat
     }
 }
 
+ObjectManager::Implementation::~Implementation() {
+    filters_.close();
+}
+
 void ObjectManager::Implementation::serve(const Registration& registration) {
     const std::string who =
         "class " + registration.className + " of provider " + registration.provider;
@@ -71,12 +79,34 @@ void ObjectManager::Implementation::serve(const Registration& registration) {
     if (declaration == nullptr) {
         throw LoadError(who + " is in none of the schema's files");
     }
-    ServedClass served{declaration,
-                       &providers_->provider(registration.location, registration.provider),
-                       registration.instance,
-                       registration.association,
-                       {}};
-    for (const std::string& nameSpace : registration.nameSpaces) {
+    Provider& provider = providers_->provider(registration.location, registration.provider);
+    if (registration.indication) {
+        filters_.serve(*declaration, provider, registration.nameSpaces);
+    }
+    serve({declaration, &provider, nullptr, registration.instance, registration.association, {}},
+          registration.nameSpaces, who);
+}
+
+void ObjectManager::Implementation::serve(std::unique_ptr<OwnClass> own) {
+    const std::string who = "own class " + own->className();
+    if (repository_.find(own->className()) == nullptr && !own->declaration().empty()) {
+        repository_.loadText(own->declaration(), who);
+    }
+    const ClassDeclaration* const declaration = repository_.find(own->className());
+    if (declaration == nullptr) {
+        throw LoadError(who + " is in none of the schema's files");
+    }
+    serve({declaration, nullptr, own.get(), true, declaration->isAssociation(), {}},
+          own->nameSpaces(), who);
+    own_.push_back(std::move(own));
+    orderAssociations();
+}
+
+void ObjectManager::Implementation::serve(ServedClass served,
+                                          const std::vector<std::string>& nameSpaces,
+                                          const std::string& who) {
+    const ClassDeclaration* const declaration = served.declaration;
+    for (const std::string& nameSpace : nameSpaces) {
         const auto known = std::find_if(nameSpaces_.begin(), nameSpaces_.end(),
                                         [&](const auto& one) { return sameName(one, nameSpace); });
         if (known == nameSpaces_.end()) {
@@ -157,6 +187,14 @@ const std::vector<std::string>& ObjectManager::nameSpaces() const noexcept {
     return implementation_->nameSpaces();
 }
 
+const std::string* ObjectManager::findNameSpace(const std::string& wanted) const {
+    return knownNameSpace(wanted, implementation_->nameSpaces());
+}
+
+void ObjectManager::serve(std::unique_ptr<OwnClass> own) {
+    implementation_->serve(std::move(own));
+}
+
 const std::string& ObjectManager::host() const noexcept {
     return implementation_->host();
 }
@@ -175,6 +213,10 @@ Result collected(Ask&& ask) {
 }
 
 }  // namespace
+
+IndicationHub& ObjectManager::indications() noexcept {
+    return implementation_->indications();
+}
 
 PathsResult ObjectManager::enumerateInstanceNames(const ObjectPath& path,
                                                   const InstanceRequest& request) {
@@ -250,6 +292,21 @@ InstancesResult ObjectManager::getInstance(const ObjectPath& path, const Instanc
 InstancesResult ObjectManager::modifyInstance(const Instance& instance,
                                               const InstanceRequest& request) {
     return implementation_->modifyInstance(instance, request);
+}
+
+PathsResult ObjectManager::createInstance(const Instance& instance,
+                                          const InstanceRequest& request) {
+    return implementation_->createInstance(instance, request);
+}
+
+Status ObjectManager::deleteInstance(const ObjectPath& path, const InstanceRequest& request) {
+    return implementation_->deleteInstance(path, request);
+}
+
+RequestEnd ObjectManager::execQuery(const std::string& nameSpace, const Query& query,
+                                    const InstanceRequest& request,
+                                    ResultReceiver<Instance>& receiver) {
+    return implementation_->execQuery(nameSpace, query, request, receiver);
 }
 
 }  // namespace cimom

@@ -1,5 +1,7 @@
 #pragma once
 
+#include <deque>
+#include <memory>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -11,17 +13,20 @@
 #include "cimom/Instance.h"
 #include "cimom/Names.h"
 #include "cimom/ObjectManager.h"
+#include "cimom/OwnClass.h"
 #include "cimom/Results.h"
+#include "manager/ActiveFilters.h"
 #include "manager/ProviderCall.h"
 #include "manager/Providers.h"
 #include "manager/RequestedObjects.h"
 
 namespace cimom {
 
-/// A class with its provider, from a registration.
+/// A class with who serves it: a provider, from a registration, or the object manager.
 struct ServedClass {
     const ClassDeclaration* declaration;
-    Provider* provider;
+    Provider* provider;  ///< null: own is there
+    OwnClass* own;       ///< null: provider is there
     bool instance;
     bool association;
     std::vector<std::string> nameSpaces;
@@ -32,6 +37,9 @@ struct ServedClass {
 class ObjectManager::Implementation {
   public:
     Implementation(ObjectManager& manager, Configuration configuration);
+    ~Implementation();
+    Implementation(const Implementation&) = delete;
+    Implementation& operator=(const Implementation&) = delete;
 
     [[nodiscard]] const ClassRepository& repository() const noexcept { return repository_; }
     [[nodiscard]] const std::vector<Registration>& registrations() const noexcept {
@@ -41,6 +49,9 @@ class ObjectManager::Implementation {
         return nameSpaces_;
     }
     [[nodiscard]] const std::string& host() const noexcept { return configuration_.host; }
+    void serve(std::unique_ptr<OwnClass> own);
+
+    [[nodiscard]] IndicationHub& indications() noexcept { return filters_; }
 
     RequestEnd enumerateInstanceNames(ObjectPath path, const InstanceRequest& request,
                                       ResultReceiver<ObjectPath>& receiver);
@@ -48,6 +59,10 @@ class ObjectManager::Implementation {
                                   ResultReceiver<Instance>& receiver);
     InstancesResult getInstance(ObjectPath path, const InstanceRequest& request);
     InstancesResult modifyInstance(Instance instance, const InstanceRequest& request);
+    PathsResult createInstance(Instance instance, const InstanceRequest& request);
+    Status deleteInstance(ObjectPath path, const InstanceRequest& request);
+    RequestEnd execQuery(const std::string& nameSpace, const Query& query,
+                         const InstanceRequest& request, ResultReceiver<Instance>& receiver);
 
     RequestEnd associatorNames(ObjectPath path, const AssociationRequest& request,
                                ResultReceiver<ObjectPath>& receiver);
@@ -70,6 +85,10 @@ class ObjectManager::Implementation {
     };
 
     void serve(const Registration& registration);
+    /// Enters a class; `who` is how errors name it. Throws LoadError when it is served already.
+    void serve(ServedClass served, const std::vector<std::string>& nameSpaces,
+               const std::string& who);
+    void orderAssociations();
     [[nodiscard]] Status canonical(ObjectPath& path) const;
     [[nodiscard]] const std::string& canonicalClass(const std::string& className) const;
     /// The served classes at or below the class, in the order of the repository.
@@ -115,6 +134,27 @@ class ObjectManager::Implementation {
                                const std::string& resultClass, const AssociationRequest& request,
                                const AnyReceiver& receiver);
 
+    CallOutcome callCreate(const ServedClass& target, const Instance& instance,
+                           const InstanceRequest& request, ResultReceiver<ObjectPath>& receiver);
+    CallOutcome callDelete(const ServedClass& target, const ObjectPath& path,
+                           const InstanceRequest& request);
+    /// The class of the target that has the instance, of those that the path can mean; null
+    /// when there is none.
+    [[nodiscard]] const ServedClass* ownerOf(const ObjectPath& path, const std::string& principal);
+
+    // The same for own classes, which only read.
+    static CallOutcome readOwn(const ServedClass& target, Reading reading, const ObjectPath& path,
+                               const AnyReceiver& receiver);
+    /// The instances of an own class of associations in which the source plays its role.
+    CallOutcome ownAssociations(const ServedClass& target, const ObjectPath& source,
+                                const std::optional<std::string>& role,
+                                std::vector<Instance>& associations) const;
+    /// What those lead to, for a receiver that wants it.
+    template <typename Object>
+    CallOutcome associatedByOwn(const ServedClass& target, const ObjectPath& source,
+                                const AssociationRequest& request,
+                                ResultReceiver<Object>& receiver);
+
     // Requests that become several calls.
     RequestEnd enumerate(Reading reading, const ObjectPath& path, const InstanceRequest& request,
                          const AnyReceiver& receiver);
@@ -143,12 +183,15 @@ class ObjectManager::Implementation {
     Configuration configuration_;
     ClassRepository repository_;
     std::vector<Registration> registrations_;
-    std::vector<ServedClass> served_;
+    std::vector<std::unique_ptr<OwnClass>> own_;
+    /// A deque, since it grows behind the construction, while others point into it.
+    std::deque<ServedClass> served_;
     /// Indices into served_, by class name.
     std::unordered_map<std::string_view, std::vector<std::size_t>, NameHash, NameEqual>
         servedByName_;
     ServedClasses associations_;  ///< all, in the order of the repository
     std::vector<std::string> nameSpaces_;
+    ActiveFilters filters_{{repository_, nameSpaces_, configuration_.host, configuration_.log}};
     /// Ends first: a provider that is being cleaned up may still ask.
     std::optional<Providers> providers_;
 };

@@ -118,9 +118,20 @@ CMPIAssociationMI* Provider::association(const std::string& nameSpace, Status& s
     return record(association_, "Association", nameSpace, status);
 }
 
+CMPIIndicationMI* Provider::indication(const std::string& nameSpace, Status& status) {
+    return record(indication_, "Indication", nameSpace, status);
+}
+
+const broker::Broker* Provider::broker() const {
+    const std::lock_guard lock(owner_.mutex_);
+    const auto loaded = std::ranges::find_if(
+        owner_.loaded_, [this](const auto& one) { return one.location == location_; });
+    return loaded == owner_.loaded_.end() ? nullptr : loaded->broker.get();
+}
+
 Providers::Providers(std::vector<std::filesystem::path> directories, const ClassRepository& classes,
-                     RequestHandler* handler)
-    : directories_(std::move(directories)), classes_(classes), handler_(handler) {}
+                     RequestHandler* handler, broker::IndicationSink* sink)
+    : directories_(std::move(directories)), classes_(classes), handler_(handler), sink_(sink) {}
 
 Provider& Providers::provider(const std::string& location, const std::string& name) {
     const std::lock_guard lock(mutex_);
@@ -139,7 +150,7 @@ Providers::Loaded& Providers::load(const std::string& location) {
         return *found;
     }
     auto library = std::make_unique<ProviderLibrary>(location, directories_);
-    auto broker = std::make_unique<broker::Broker>(classes_, handler_);
+    auto broker = std::make_unique<broker::Broker>(classes_, handler_, sink_);
     return loaded_.emplace_back(Loaded{location, std::move(broker), std::move(library)});
 }
 
@@ -158,6 +169,8 @@ void Providers::cleanUp(Provider& provider) {
         static_cast<void>(guardedCall(provider.name() + ": cleanup of " + kind,
                                       [&] { return record->ft->cleanup(record, context, 1); }));
     };
+    // First, since it may have a thread that asks for what the others serve.
+    end(provider.indication_.exchange(nullptr), "Indication");
     end(provider.instance_.exchange(nullptr), "Instance");
     end(provider.association_.exchange(nullptr), "Association");
 }

@@ -32,6 +32,9 @@ class Provider {
     /// with the next request. `nameSpace` is one that the provider serves.
     CMPIInstanceMI* instance(const std::string& nameSpace, Status& status);
     CMPIAssociationMI* association(const std::string& nameSpace, Status& status);
+    CMPIIndicationMI* indication(const std::string& nameSpace, Status& status);
+    /// What its library calls; null before a record was made.
+    [[nodiscard]] const broker::Broker* broker() const;
 
   private:
     friend class Providers;
@@ -45,6 +48,7 @@ class Provider {
     const std::string name_;
     std::atomic<CMPIInstanceMI*> instance_{nullptr};
     std::atomic<CMPIAssociationMI*> association_{nullptr};
+    std::atomic<CMPIIndicationMI*> indication_{nullptr};
     bool creating_ = false;  ///< guarded by the owner's mutex
 };
 
@@ -52,10 +56,10 @@ class Provider {
 /// libraries; no request may run then.
 class Providers {
   public:
-    /// Classes and handler must outlive the providers. Without a handler, requests of
-    /// providers to each other are not supported.
+    /// Classes, handler and sink must outlive the providers. Without a handler, requests of
+    /// providers to each other are not supported; without a sink, indications are not.
     Providers(std::vector<std::filesystem::path> directories, const ClassRepository& classes,
-              RequestHandler* handler);
+              RequestHandler* handler, broker::IndicationSink* sink = nullptr);
     ~Providers();
     Providers(const Providers&) = delete;
     Providers& operator=(const Providers&) = delete;
@@ -78,6 +82,7 @@ class Providers {
     const std::vector<std::filesystem::path> directories_;
     const ClassRepository& classes_;
     RequestHandler* const handler_;
+    broker::IndicationSink* const sink_;
     /// Held while a library is loaded and while a factory runs; recursive since
     /// a factory may ask other providers.
     std::recursive_mutex mutex_;

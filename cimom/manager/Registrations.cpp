@@ -186,9 +186,10 @@ class RegistrationReader {
                 current_->instance = true;
             } else if (sameName(word, "association")) {
                 current_->association = true;
-            } else if (!sameName(word, "method") && !sameName(word, "property") &&
-                       !sameName(word, "indication")) {
-                // Those three are kinds that other object managers serve.
+            } else if (sameName(word, "indication")) {
+                current_->indication = true;
+            } else if (!sameName(word, "method") && !sameName(word, "property")) {
+                // Those two are kinds that other object managers serve.
                 fail(line_, "\"" + word + "\" is not a type of provider");
             }
         }

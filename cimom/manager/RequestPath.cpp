@@ -83,12 +83,39 @@ std::string plainNameSpace(const std::string& nameSpace) {
     return nameSpace.substr(first, nameSpace.find_last_not_of('/') - first + 1);
 }
 
+const std::string* knownNameSpace(const std::string& wanted,
+                                  const std::vector<std::string>& nameSpaces) {
+    const std::string plain = plainNameSpace(wanted);
+    const auto find = [&nameSpaces](std::string_view name) -> const std::string* {
+        const auto found = std::ranges::find_if(
+            nameSpaces, [name](const std::string& one) { return sameName(one, name); });
+        return found == nameSpaces.end() ? nullptr : &*found;
+    };
+    const std::string* const known = find(plain);
+    return known == nullptr && sameName(plain, "interop") ? find("root/interop") : known;
+}
+
+void canonicalizeReferences(std::vector<NamedValue>& values,
+                            const std::vector<std::string>& nameSpaces) {
+    for (NamedValue& named : values) {
+        const Scalar* const scalar = named.value.scalar();
+        const auto* const reference =
+            scalar == nullptr ? nullptr : std::get_if<std::shared_ptr<const ObjectPath>>(scalar);
+        const std::string* const known =
+            reference == nullptr ? nullptr : knownNameSpace((*reference)->nameSpace, nameSpaces);
+        if (known != nullptr && *known != (*reference)->nameSpace) {
+            ObjectPath path = **reference;
+            path.nameSpace = *known;
+            named.value.content = Scalar(std::make_shared<const ObjectPath>(std::move(path)));
+        }
+    }
+}
+
 Status canonicalize(ObjectPath& path, const ClassRepository& repository,
                     const std::vector<std::string>& nameSpaces) {
-    const std::string wanted = plainNameSpace(path.nameSpace);
-    const auto known = std::find_if(nameSpaces.begin(), nameSpaces.end(),
-                                    [&](const std::string& one) { return sameName(one, wanted); });
-    if (known == nameSpaces.end()) {
+    const std::string* const known = knownNameSpace(path.nameSpace, nameSpaces);
+    if (known == nullptr) {
+        const std::string wanted = plainNameSpace(path.nameSpace);
         return {CMPI_RC_ERR_INVALID_NAMESPACE,
                 wanted.empty() ? "the path has no namespace" : "no namespace \"" + wanted + "\""};
     }
@@ -106,6 +133,7 @@ Status canonicalize(ObjectPath& path, const ClassRepository& repository,
                                                        std::string(typeName(property->type))};
         }
     }
+    canonicalizeReferences(path.keys, nameSpaces);
     return {};
 }
 

@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <iterator>
+#include <limits>
 #include <unordered_set>
 #include <utility>
 
@@ -30,6 +31,11 @@ constexpr std::chrono::seconds troublePause{1};
 // Ten thousand links take a twentieth of it. A busy machine needs longer, and links that
 // have come in part only are not shown.
 constexpr std::chrono::seconds kernelTime{1};
+
+// What one reading left to the next is read soon; but on a machine that never comes to rest,
+// not all the time.
+constexpr std::chrono::milliseconds soon{20};
+constexpr int soonTries = 5;
 
 // Files and command lines of clients name further files. Their directories are to be
 // watched, too, before they are read, which takes another round.
@@ -121,6 +127,31 @@ bool LiveMachine::awaiting() {
     return processor_.awaiting();
 }
 
+ChangeSigns LiveMachine::signs() {
+    using namespace std::chrono;  // NOLINT(google-build-using-namespace): of this function only
+    const auto now = steady_clock::now();
+    ChangeSigns signs{.descriptor = monitor_.sign(), .askAt = std::nullopt};
+    if (!signs.descriptor || monitor_.isBlind() || troubled_) {
+        signs.askNoLaterThan(now + slowest);
+    }
+    if (monitor_.isMarked()) {
+        signs.askNoLaterThan(now + (unfinished_ < soonTries ? soon : slowest));
+    }
+    // By the clock that the seconds of the snapshot are of: its next second begins then.
+    const auto time = system_clock::now();
+    const auto second = ceil<milliseconds>(floor<seconds>(time) + 1s - time);
+    if (hasNetwork_) {
+        signs.askNoLaterThan(now + second);
+    }
+    if (changesAt_ != std::numeric_limits<std::int64_t>::max()) {
+        // Far ends are looked at again meanwhile: the clock may be set.
+        const std::int64_t left = changesAt_ - surroundings_.now() - 1;
+        signs.askNoLaterThan(now + second + seconds{std::clamp<std::int64_t>(left, 0, 60)});
+    }
+    signs.askNoLaterThan(now + processor_.rest());
+    return signs;
+}
+
 std::shared_ptr<const Snapshot> LiveMachine::read() {
     try {
         return tryToRead();
@@ -155,6 +186,9 @@ std::shared_ptr<const Snapshot> LiveMachine::tryToRead() {
     report(clients.diagnostics);
     readAt_ = surroundings_.now();
     lookedAt_ = readAt_;
+    hasNetwork_ = std::ranges::any_of(
+        network.links, [](const Link& link) { return link.arphrdType != ARPHRD_LOOPBACK; });
+    unfinished_ = monitor_.isMarked() ? unfinished_ + 1 : 0;
     const Machine machine{{.hostName = std::move(system.name),
                            .links = std::move(network.links),
                            .addresses = std::move(network.addresses),

@@ -48,6 +48,7 @@ class LiveMachine final : public SnapshotSource {
 
     [[nodiscard]] bool changed() override;
     [[nodiscard]] bool awaiting() override;
+    [[nodiscard]] ChangeSigns signs() override;
     [[nodiscard]] std::shared_ptr<const Snapshot> read() override;
 
   private:
@@ -68,6 +69,8 @@ class LiveMachine final : public SnapshotSource {
     std::int64_t readAt_ = 0;                   // when the last snapshot was made
     std::int64_t changesAt_ = 0;                // when it is no longer true, though nothing happens
     std::int64_t lookedAt_ = 0;                 // for what nothing announces
+    bool hasNetwork_ = false;                   // there are links at which clients may come
+    int unfinished_ = 0;                        // readings in a row that left something to read
     std::unordered_set<std::string> reported_;  // of the last reading
     bool troubled_ = false;                     // something could not be read
     std::chrono::steady_clock::time_point troubleRest_;  // it is not tried again before

@@ -51,7 +51,10 @@ constexpr std::array udhcpcPlaces{StatePlace{udhcpcStateDirectory, udhcpcStatePr
 constexpr std::array ipconfigPlaces{StatePlace{ipconfigDirectory, ipconfigPrefix}};
 constexpr std::array dhcp6cPlaces{StatePlace{pidDirectory, "dhcp6c"}};
 constexpr std::array netplanPlaces{StatePlace{netplanDirectory, ""}};
+// A file names the further directory. Were it not watched from the start, a first
+// reading would have to read everything once more.
 constexpr std::array ifupdownPlaces{StatePlace{ifupdownDirectory, ifupdownFile},
+                                    StatePlace{ifupdownFurtherDirectory, ""},
                                     StatePlace{ifupdownStateDirectory, ifupdownStateFile}};
 constexpr std::array ifcfgPlaces{StatePlace{ifcfgDirectories[0], ifcfgPrefix},
                                  StatePlace{ifcfgDirectories[1], ifcfgPrefix}};

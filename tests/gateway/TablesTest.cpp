@@ -119,8 +119,10 @@ INSTANTIATE_TEST_SUITE_P(Of, TablesTest,
                          [](const auto& each) { return std::string(each.param.name); });
 
 TEST(TablesTest, HaveTheClassesOfTheRegistration) {
-    const auto registrations =
-        cimom::readRegistrations(ZR_SOURCE_DIR "/schema/DHCPClient.registration");
+    auto registrations = cimom::readRegistrations(ZR_SOURCE_DIR "/schema/DHCPClient.registration");
+    std::erase_if(registrations, [](const cimom::Registration& each) {
+        return each.provider == "DHCPClientExtensions";
+    });
     EXPECT_THAT(allClasses(), SizeIs(registrations.size()));
     for (const cimom::Registration& registration : registrations) {
         const ServedClass* served = findClass(registration.className);

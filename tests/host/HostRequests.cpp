@@ -183,6 +183,9 @@ std::vector<HostRequest> allRequests(cimom::ObjectManager& manager) {
     Texts associations;
     std::vector<cimom::ObjectPath> paths;
     for (const cimom::Registration& registration : manager.registrations()) {
+        if (!registration.instance) {
+            continue;  // of indications, which no request asks for
+        }
         const cimom::ObjectPath ofClass{"", "root/cimv2", registration.className, {}};
         requests.push_back({Operation::enumerateNames, ofClass, ""});
         requests.push_back({Operation::enumerate, ofClass, ""});

@@ -42,6 +42,10 @@ completes 'QVXZR_DHCPProtocolEndpoint' --format json instances QVXZR_DHCPP
 completes 'QVXZR_SAPSAPDependency' associators --assoc-class QVXZR_SAP
 completes 'eth0 eth1' rename eth
 completes '' rename eth0 of
+completes 'eth0 eth1' watch wlan0 eth
+completes '--parallel --poll' watch --p
+completes '' watch --poll ''
+completes 'version' profiles --sort v
 completes '--create' rename --crea
 completes '--sort --schema-dir --svg' graph --s
 completes "$3" --tree "${3%.json}"

@@ -40,24 +40,11 @@ void readParameters(XmlElement& element, Call& call) {
     }
 }
 
-Call readMessage(XmlElement cim) {
-    expectName(cim, "CIM");
-    checkVersion(cim, "CIMVERSION", "2.", "unsupported-cim-version");
-    checkVersion(cim, "DTDVERSION", "2.", "unsupported-dtd-version");
-    const XmlElement& message = onlyChild(cim);
-    expectName(message, "MESSAGE");
+Call callOf(ReadMessage message) {
     Call call;
-    call.messageId = requiredAttribute(message, "ID");
-    checkVersion(message, "PROTOCOLVERSION", "1.", "unsupported-protocol-version");
-    call.protocolVersion = *message.attribute("PROTOCOLVERSION");
-    XmlElement& request = cim.children.front().children.empty()
-                              ? throw NotValid("the content of MESSAGE")
-                              : cim.children.front().children.front();
-    static_cast<void>(onlyChild(message));
-    if (request.name == "MULTIREQ") {
-        throw HttpFailure(http::notImplemented, "multiple-requests-unsupported",
-                          "several requests");
-    }
+    call.messageId = std::move(message.id);
+    call.protocolVersion = std::move(message.protocolVersion);
+    XmlElement& request = message.content;
     expectName(request, "SIMPLEREQ");
     expectNoText(request);
     // Correlators are for event logs, and may be passed over.
@@ -85,9 +72,29 @@ Call readMessage(XmlElement cim) {
 
 }  // namespace
 
+ReadMessage readMessage(XmlElement cim) {
+    expectName(cim, "CIM");
+    checkVersion(cim, "CIMVERSION", "2.", "unsupported-cim-version");
+    checkVersion(cim, "DTDVERSION", "2.", "unsupported-dtd-version");
+    static_cast<void>(onlyChild(cim));
+    XmlElement& message = cim.children.front();
+    expectName(message, "MESSAGE");
+    ReadMessage read;
+    read.id = requiredAttribute(message, "ID");
+    checkVersion(message, "PROTOCOLVERSION", "1.", "unsupported-protocol-version");
+    read.protocolVersion = *message.attribute("PROTOCOLVERSION");
+    static_cast<void>(onlyChild(message));
+    read.content = std::move(message.children.front());
+    if (read.content.name == "MULTIREQ" || read.content.name == "MULTIEXPREQ") {
+        throw HttpFailure(http::notImplemented, "multiple-requests-unsupported",
+                          "several requests");
+    }
+    return read;
+}
+
 Call readCall(std::string_view body, std::size_t maximumDepth) {
     try {
-        return readMessage(readXml(body, maximumDepth));
+        return callOf(readMessage(readXml(body, maximumDepth)));
     } catch (const XmlError& error) {
         throw HttpFailure(http::badRequest, "request-not-well-formed", error.what());
     } catch (const NotValid& error) {

@@ -12,12 +12,16 @@ struct Status;
 
 struct PropertyDeclaration;
 struct ClassDeclaration;
+struct QualifierType;
 class ClassRepository;
 
 struct AssociationRequest;
 struct PathsResult;
 struct InstancesResult;
 class RequestHandler;
+class IndicationHub;
+class OwnClass;
+class Query;
 class ObjectManager;
 
 }  // namespace cimom

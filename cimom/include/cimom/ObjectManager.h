@@ -36,17 +36,29 @@ class ObjectManager final : public RequestHandler {
     /// Reads schema and registrations; providers are opened when first asked.
     /// Throws MofError or LoadError.
     explicit ObjectManager(Configuration configuration);
-    /// Cleans up and unloads every provider.
+    /// Cleans up and unloads every provider; the own classes end behind them.
     ~ObjectManager() override;
     ObjectManager(const ObjectManager&) = delete;
     ObjectManager& operator=(const ObjectManager&) = delete;
 
+    /// Serves a class without a provider. Only while no request runs, and so before the
+    /// first. Throws LoadError for a class that neither schema nor its own declaration knows,
+    /// or that a provider serves in one of the namespaces, and MofError for a declaration
+    /// that cannot be read.
+    void serve(std::unique_ptr<OwnClass> own);
+
     [[nodiscard]] const ClassRepository& repository() const noexcept;
     [[nodiscard]] const std::vector<Registration>& registrations() const noexcept;
-    /// The namespaces that the registrations name, each once, in their order.
+    /// The namespaces that the registrations and the own classes name, each once, in their
+    /// order.
     [[nodiscard]] const std::vector<std::string>& nameSpaces() const noexcept;
+    /// The one of them that a client means, who may write it in any case, and "interop" for
+    /// "root/interop"; null: none.
+    [[nodiscard]] const std::string* findNameSpace(const std::string& wanted) const;
     /// The host of full paths.
     [[nodiscard]] const std::string& host() const noexcept;
+    /// Subscriptions to what providers tell by themselves.
+    [[nodiscard]] IndicationHub& indications() noexcept;
 
     RequestEnd enumerateInstanceNames(const ObjectPath& path, const InstanceRequest& request,
                                       ResultReceiver<ObjectPath>& receiver) override;
@@ -56,6 +68,14 @@ class ObjectManager final : public RequestHandler {
                                 const InstanceRequest& request = {}) override;
     InstancesResult modifyInstance(const Instance& instance,
                                    const InstanceRequest& request = {}) override;
+    /// Makes an instance of its path's class, in its path's namespace; the keys of that path
+    /// do not count. The result is the path of the instance.
+    PathsResult createInstance(const Instance& instance, const InstanceRequest& request = {});
+    Status deleteInstance(const ObjectPath& path, const InstanceRequest& request = {});
+    /// The instances that the query selects in a namespace, with the selected properties. The
+    /// request's property list does not count.
+    RequestEnd execQuery(const std::string& nameSpace, const Query& query,
+                         const InstanceRequest& request, ResultReceiver<Instance>& receiver);
     RequestEnd associatorNames(const ObjectPath& path, const AssociationRequest& request,
                                ResultReceiver<ObjectPath>& receiver) override;
     RequestEnd associators(const ObjectPath& path, const AssociationRequest& request,

@@ -15,6 +15,7 @@ struct Registration {
     bool instance = false;
     bool association = false;
     std::vector<std::string> nameSpaces;
+    bool indication = false;
 
     bool operator==(const Registration&) const = default;
 };

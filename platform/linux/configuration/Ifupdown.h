@@ -14,6 +14,8 @@ namespace ZR::Live {
 
 inline constexpr std::string_view ifupdownDirectory = "/etc/network";
 inline constexpr std::string_view ifupdownFile = "interfaces";
+/// Where the file that systems come with looks for further ones.
+inline constexpr std::string_view ifupdownFurtherDirectory = "/etc/network/interfaces.d";
 inline constexpr std::string_view ifupdownStateDirectory = "/run/network";
 inline constexpr std::string_view ifupdownStateFile = "ifstate";
 

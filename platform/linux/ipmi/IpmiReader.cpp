@@ -1,5 +1,6 @@
 #include "ipmi/IpmiReader.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <iterator>
 #include <utility>
@@ -14,6 +15,16 @@ IpmiReader::IpmiReader(std::unique_ptr<IpmiTransport> transport, Clock clock)
 bool IpmiReader::changed() {
     advance();
     return known_ != given_;
+}
+
+std::chrono::steady_clock::duration IpmiReader::rest() const {
+    // A conversation is over within some seconds, and begins once a minute at most.
+    constexpr std::chrono::milliseconds pause(100);
+    using Duration = std::chrono::steady_clock::duration;
+    if (conversation_) {
+        return pause;
+    }
+    return due_ ? std::max<Duration>(*due_ - clock_(), pause) : pause;
 }
 
 std::optional<ServiceProcessor> IpmiReader::read(std::vector<Diagnostic>& diagnostics) {

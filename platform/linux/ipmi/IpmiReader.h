@@ -41,6 +41,9 @@ class IpmiReader {
     /// Whether requests are out whose responses may still come.
     [[nodiscard]] bool awaiting() const noexcept { return conversation_.has_value(); }
 
+    /// How long until changed() may have something to do again.
+    [[nodiscard]] std::chrono::steady_clock::duration rest() const;
+
     /// What is known; nullopt when the machine has no service processor. Adds the reasons
     /// why no more is known to the diagnostics.
     [[nodiscard]] std::optional<ServiceProcessor> read(std::vector<Diagnostic>& diagnostics);

@@ -1,8 +1,10 @@
 #include "kernel/ChangeMonitor.h"
 
+#include <fcntl.h>
 #include <linux/netlink.h>
 #include <linux/rtnetlink.h>
 #include <poll.h>
+#include <sys/epoll.h>
 #include <sys/inotify.h>
 #include <sys/socket.h>
 #include <sys/syscall.h>
@@ -105,6 +107,7 @@ void ChangeMonitor::watchProcesses(std::span<const std::int32_t> pids) {
         // The C library has a function for it only in its newer versions.
         UniqueFd descriptor{static_cast<int>(::syscall(SYS_pidfd_open, pid, 0))};
         if (descriptor) {
+            announce(descriptor);
             processes.emplace(pid, std::move(descriptor));
         } else if (errno == ESRCH) {
             changed_ = true;
@@ -127,7 +130,9 @@ void ChangeMonitor::openSubscription(std::vector<Diagnostic>& diagnostics) {
         diagnostics.emplace_back("cannot subscribe to network changes: " + reasonOf(errno));
         subscription_.reset();
         blind_ = true;
+        return;
     }
+    announce(subscription_);
 }
 
 void ChangeMonitor::openWatches(std::vector<Diagnostic>& diagnostics) {
@@ -140,6 +145,32 @@ void ChangeMonitor::openWatches(std::vector<Diagnostic>& diagnostics) {
     if (!watches_) {
         diagnostics.emplace_back("cannot watch files: " + reasonOf(errno));
         blind_ = true;
+        return;
+    }
+    announce(watches_);
+}
+
+UniqueFd ChangeMonitor::sign() {
+    if (!announced_) {
+        announced_.reset(::epoll_create1(EPOLL_CLOEXEC));
+        announce(subscription_);
+        announce(watches_);
+        for (const auto& [pid, descriptor] : processes_) {
+            announce(descriptor);
+        }
+    }
+    return UniqueFd(announced_ ? ::fcntl(announced_.get(), F_DUPFD_CLOEXEC, 0) : -1);
+}
+
+/// The set keeps no descriptor open: one that is closed leaves it.
+void ChangeMonitor::announce(const UniqueFd& descriptor) {
+    if (!announced_ || !descriptor) {
+        return;
+    }
+    epoll_event event{};
+    event.events = EPOLLIN;
+    if (::epoll_ctl(announced_.get(), EPOLL_CTL_ADD, descriptor.get(), &event) != 0) {
+        blind_ = true;  // what it tells would not be heard
     }
 }
 

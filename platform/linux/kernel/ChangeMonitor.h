@@ -40,6 +40,15 @@ class ChangeMonitor {
     /// Stays true until the next begin(). Never blocks.
     [[nodiscard]] bool changed();
 
+    /// What becomes readable when changed() may become true; made when it is first asked for.
+    /// None where that is not possible.
+    [[nodiscard]] UniqueFd sign();
+
+    /// Whether something happened that cannot be announced any more.
+    [[nodiscard]] bool isMarked() const noexcept { return changed_; }
+    /// Whether something cannot be watched, so that changed() is always true.
+    [[nodiscard]] bool isBlind() const noexcept { return blind_; }
+
     /// Makes changed() true until the next begin().
     void markChanged() noexcept { changed_ = true; }
 
@@ -57,6 +66,7 @@ class ChangeMonitor {
     void watchAll(const std::vector<WatchedPlace>& places, std::vector<Diagnostic>& diagnostics);
     void watch(const WatchedPlace& place, Arming& arming, std::vector<Diagnostic>& diagnostics);
     int watchAncestor(std::string directory, Arming& arming) const;
+    void announce(const UniqueFd& descriptor);
     bool drainSubscription();
     bool drainWatches();
     bool concerns(int watch, std::uint32_t mask, std::string_view name);
@@ -65,6 +75,7 @@ class ChangeMonitor {
     UniqueFd watches_;
     Interests interests_;
     std::map<std::int32_t, UniqueFd> processes_;
+    UniqueFd announced_;         // an epoll set of all the above, once one waits for them
     std::vector<pollfd> asked_;  // kept for its memory
     std::vector<WatchedPlace> places_;
     bool blind_ = true;  // something cannot be watched at all

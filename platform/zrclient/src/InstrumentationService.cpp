@@ -1,5 +1,13 @@
 #include "zrclient/InstrumentationService.h"
 
+#include <poll.h>
+#include <sys/eventfd.h>
+
+#include <algorithm>
+#include <array>
+#include <cerrno>
+#include <climits>
+#include <system_error>
 #include <thread>
 #include <utility>
 
@@ -16,6 +24,7 @@ std::atomic<InstrumentationService::OpenMachine> openMachine = nullptr;
 class NoMachine : public SnapshotSource {
   public:
     bool changed() override { return false; }
+    ChangeSigns signs() override { return {}; }
     std::shared_ptr<const Snapshot> read() override { return SnapshotBuilder().build(); }
 };
 
@@ -32,7 +41,8 @@ std::unique_ptr<SnapshotSource> openSourceOfSettings() {
 
 InstrumentationService& InstrumentationService::process() {
     // Destroyed when the library is unloaded, and its descriptors with it.
-    static InstrumentationService service;
+    static InstrumentationService service(nullptr,
+                                          PlatformSettings::process().serviceProcessorWait);
     return service;
 }
 
@@ -40,8 +50,9 @@ void InstrumentationService::setMachine(OpenMachine open) noexcept {
     openMachine = open;
 }
 
-InstrumentationService::InstrumentationService(std::unique_ptr<SnapshotSource> source)
-    : source_(std::move(source)) {}
+InstrumentationService::InstrumentationService(std::unique_ptr<SnapshotSource> source,
+                                               std::chrono::milliseconds firstWait)
+    : source_(std::move(source)), firstWait_(firstWait) {}
 
 std::shared_ptr<const Snapshot> InstrumentationService::published() {
     const std::lock_guard lock(snapshotMutex_);
@@ -58,6 +69,13 @@ SnapshotSource& InstrumentationService::openedSource() {
 
 /// Reads the source and publishes what it read. Call with the source locked.
 std::shared_ptr<const Snapshot> InstrumentationService::readSource() {
+    // Also after a failure: what another thread has made of the source's descriptors, who
+    // waits for these would not see.
+    struct Wake {
+        InstrumentationService& service;
+        ~Wake() { service.wakeWaiters(); }
+    };
+    const Wake wake{*this};
     std::shared_ptr<const Snapshot> newest = openedSource().read();
     ++readings_;
     std::shared_ptr<const Snapshot> replaced = newest;
@@ -70,6 +88,12 @@ std::shared_ptr<const Snapshot> InstrumentationService::readSource() {
 }
 
 std::shared_ptr<const Snapshot> InstrumentationService::current() {
+    using std::chrono::milliseconds;
+    if (firstWait_.load() > milliseconds(0)) {
+        if (const milliseconds wait = firstWait_.exchange(milliseconds(0)); wait.count() > 0) {
+            settle(wait);
+        }
+    }
     // Two requests never ask the source at once: the second one waits for a
     // reading under way and then polls for itself, so that what it gets is at
     // least as new as its call.
@@ -110,9 +134,100 @@ std::shared_ptr<const Snapshot> InstrumentationService::latest() {
 }
 
 void InstrumentationService::useSource(std::unique_ptr<SnapshotSource> source) {
-    // The replaced source is closed after the lock is let go.
+    {
+        // The replaced source is closed after the lock is let go.
+        const std::lock_guard lock(sourceMutex_);
+        source_.swap(source);
+    }
+    wakeWaiters();
+}
+
+ChangeSigns InstrumentationService::signs() {
     const std::lock_guard lock(sourceMutex_);
-    source_.swap(source);
+    return openedSource().signs();
+}
+
+void InstrumentationService::wakeWaiters() noexcept {
+    const std::lock_guard lock(waitersMutex_);
+    for (const Waiter* const waiter : waiters_) {
+        waiter->wake();
+    }
+}
+
+InstrumentationService::Waiter::Waiter(InstrumentationService& service)
+    : service_(service), event_(::eventfd(0, EFD_NONBLOCK | EFD_CLOEXEC)) {
+    if (!event_) {
+        throw std::system_error(errno, std::generic_category(), "eventfd");
+    }
+    const std::lock_guard lock(service_.waitersMutex_);
+    service_.waiters_.push_back(this);
+}
+
+InstrumentationService::Waiter::~Waiter() {
+    const std::lock_guard lock(service_.waitersMutex_);
+    std::erase(service_.waiters_, this);
+}
+
+void InstrumentationService::Waiter::wake() const noexcept {
+    // Fails only when it has been woken very often already.
+    static_cast<void>(::eventfd_write(event_.get(), 1));
+}
+
+void InstrumentationService::Waiter::refresh() noexcept {
+    refreshed_ = true;
+    wake();
+}
+
+void InstrumentationService::Waiter::stop() noexcept {
+    stopped_ = true;
+    wake();
+}
+
+/// Waits for any of the signs; true when another thread has read, or stopped the wait.
+bool InstrumentationService::Waiter::wait(const ChangeSigns& signs) const {
+    using std::chrono::ceil;
+    using std::chrono::milliseconds;
+    std::array<pollfd, 2> asked{
+        pollfd{.fd = event_.get(), .events = POLLIN, .revents = 0},
+        pollfd{.fd = signs.descriptor.get(), .events = POLLIN, .revents = 0}};
+    int timeout = -1;
+    if (signs.askAt) {
+        const auto rest = ceil<milliseconds>(*signs.askAt - std::chrono::steady_clock::now());
+        timeout = static_cast<int>(std::clamp<std::int64_t>(rest.count(), 0, INT_MAX));
+    }
+    // Woken by a signal, the source is asked too early, which does no harm.
+    static_cast<void>(::poll(asked.data(), asked.size(), timeout));
+    if (asked[0].revents == 0) {
+        return false;
+    }
+    eventfd_t ignored = 0;
+    static_cast<void>(::eventfd_read(event_.get(), &ignored));
+    return true;
+}
+
+std::shared_ptr<const Snapshot> InstrumentationService::Waiter::next(
+    const std::shared_ptr<const Snapshot>& known) {
+    // What follows one upon the other becomes one reading, so that many links which come at
+    // once do not have the machine read for each.
+    constexpr std::chrono::milliseconds pause(10);
+    while (!stopped_) {
+        if (refreshed_.exchange(false)) {
+            return service_.current();
+        }
+        if (auto newest = service_.published(); newest && newest != known) {
+            return newest;
+        }
+        if (known && wait(service_.signs())) {
+            continue;
+        }
+        if (known) {
+            std::this_thread::sleep_for(pause);
+        }
+        if (auto newest = service_.current(); newest != known) {
+            return newest;
+        }
+    }
+    return nullptr;
 }
 
 }  // namespace ZR

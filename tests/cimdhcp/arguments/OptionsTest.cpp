@@ -46,6 +46,29 @@ TEST(OptionRules, NamesServers) {
     EXPECT_FALSE(Options{}.remote());
 }
 
+TEST(OptionRules, SaysHowToWatch) {
+    WatchCommand watch;
+    EXPECT_EQ(line({"watch"}).command, Command(watch));
+    watch.interfaces = {"eth0", "eth1"};
+    watch.poll = std::chrono::seconds(5);
+    EXPECT_EQ(line({"watch", "eth0", "--poll", "5", "eth1"}).command, Command(watch));
+    watch = {};
+    watch.listen = "192.0.2.9";
+    EXPECT_EQ(line({"--connect", "h", "watch", "--listen", "192.0.2.9"}).command, Command(watch));
+    EXPECT_EQ(line({"profiles"}).command, Command(ProfilesCommand{}));
+    for (const char* option :
+         {"--poll=0", "--poll=86401", "--poll=x", "--sort=STATE", "--count", "--format=mof"}) {
+        EXPECT_NE(refusal({"watch", option}), "accepted") << option;
+    }
+    const std::string forServers =
+        "--listen is for servers that tell of changes: with --connect or --hosts, and without "
+        "--poll";
+    EXPECT_EQ(refusal({"watch", "--listen", "::1"}), forServers);
+    EXPECT_EQ(refusal({"--connect", "h", "watch", "--poll", "1", "--listen", "::1"}), forServers);
+    EXPECT_NE(refusal({"profiles", "--format", "mof"}), "accepted");
+    EXPECT_EQ(line({"profiles", "--sort", "version"}).options.sort, "version");
+}
+
 TEST(OptionRules, AnAddressInBracketsKeepsThem) {
     const std::vector<std::string> servers{"[::1]", "[::1]:5988", "[a,b]"};
     EXPECT_EQ(line({"--connect", "[::1]", "--connect=[::1]:5988", "--connect=[a,b]", "show"})
@@ -153,6 +176,32 @@ TEST(ServeOptions, EachLimitIsItsOwn) {
         arguments.push_back(std::to_string(arguments.size() / 2 + 1));
     }
     EXPECT_EQ(read(arguments), serve);
+}
+
+TEST(ServeOptions, SayHowListenersAreServed) {
+    ServeCommand serve;
+    serve.subscriptions = "dir";
+    serve.delivery.caCertificates = "ca.pem";
+    serve.subscriptionLimits.filters = 1;
+    serve.subscriptionLimits.listeners = 2;
+    serve.subscriptionLimits.subscriptions = 3;
+    serve.delivery.queued = 4;
+    serve.delivery.retries = 0;
+    serve.delivery.retryInterval = std::chrono::seconds(5);
+    serve.delivery.patience = std::chrono::seconds(6);
+    serve.delivery.removalTime = std::chrono::seconds(7);
+    EXPECT_EQ(read({"--subscriptions",     "dir", "--listener-cacert", "ca.pem",
+                    "--max-filters",       "1",   "--max-listeners",   "2",
+                    "--max-subscriptions", "3",   "--max-queue",       "4",
+                    "--delivery-retries",  "0",   "--retry-interval",  "5",
+                    "--listener-timeout",  "6",   "--give-up-after",   "7"}),
+              serve);
+    for (const char* option :
+         {"--max-filters", "--max-listeners", "--max-subscriptions", "--max-queue",
+          "--retry-interval", "--listener-timeout", "--give-up-after"}) {
+        EXPECT_THROW(static_cast<void>(read({option, "0"})), CLI::ParseError) << option;
+        EXPECT_THROW(static_cast<void>(read({option, "-1"})), CLI::ParseError) << option;
+    }
 }
 
 TEST(ServeOptions, RefuseWhatIsNotANumber) {

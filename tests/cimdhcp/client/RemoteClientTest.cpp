@@ -81,7 +81,7 @@ TEST_F(RemoteServer, FailuresOfHttpAreTold) {
     EXPECT_EQ(failure(httpResponse("", "401 Unauthorized", "WWW-Authenticate: Basic\r\n")),
               "HTTP 401: it wants a user and a password; --credentials FILE holds them");
     HttpSettings settings;
-    settings.credential = Credential{"127.0.0.1", std::nullopt, "ada", "geheim"};
+    settings.credential = cimom::wbem::UserAndPassword{"ada", "geheim"};
     EXPECT_EQ(
         failure(httpResponse("", "401 Unauthorized", "WWW-Authenticate: Basic\r\n"), settings),
         "HTTP 401: it refuses user ada with that password");

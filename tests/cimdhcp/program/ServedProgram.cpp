@@ -22,7 +22,9 @@ ServedProgram::ServedProgram(const std::string& program, const std::vector<std::
     ZR::UniqueFd input(ends[1]);
     std::vector<std::string> words{program};
     words.insert(words.end(), arguments.begin(), arguments.end());
+    // The first of a name counts.
     std::vector<std::string> variables = environment;
+    variables.push_back("STATE_DIRECTORY=" + state_.path().string());
     const auto pointers = [](std::vector<std::string>& texts) {
         std::vector<char*> result;
         for (std::string& text : texts) {

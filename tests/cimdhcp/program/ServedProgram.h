@@ -5,6 +5,7 @@
 #include <string>
 #include <vector>
 
+#include "kit/TemporaryDirectory.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace test {
@@ -13,7 +14,8 @@ namespace test {
 /// object ends. Throws when it ends before that, with what it wrote.
 class ServedProgram {
   public:
-    /// `arguments` as for the program; "serve" is among them.
+    /// `arguments` as for the program; "serve" is among them. Unless the environment names a
+    /// STATE_DIRECTORY, the server gets one of its own.
     ServedProgram(const std::string& program, const std::vector<std::string>& arguments,
                   const std::vector<std::string>& environment);
     ~ServedProgram();
@@ -31,6 +33,7 @@ class ServedProgram {
     int end();
 
   private:
+    ZR::Testing::TemporaryDirectory state_;
     pid_t child_ = -1;
     ZR::UniqueFd output_;
     std::string url_;

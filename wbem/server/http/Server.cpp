@@ -13,7 +13,7 @@
 #include "http/Connections.h"
 #include "http/Dispatcher.h"
 #include "http/Exchange.h"
-#include "http/ListeningSocket.h"
+#include "transport/ListeningSocket.h"
 
 namespace cimom::wbem {
 
@@ -51,7 +51,11 @@ class Server::Implementation {
           log_(std::move(log)),
           connections_(settings_.limits.request, settings_.limits.response),
           dispatcher_(manager, settings_, log_) {
-        start();
+        try {
+            start();
+        } catch (const SocketError& error) {
+            throw ServerError(error.what());
+        }
         watch();
     }
 

@@ -1,5 +1,6 @@
 #include "sources/FileWatch.h"
 
+#include <fcntl.h>
 #include <sys/inotify.h>
 #include <unistd.h>
 
@@ -143,6 +144,10 @@ bool FileWatch::changed() {
             return changed_;
         }
     }
+}
+
+UniqueFd FileWatch::sign() const {
+    return UniqueFd(inotify_ ? ::fcntl(inotify_.get(), F_DUPFD_CLOEXEC, 0) : -1);
 }
 
 void FileWatch::takeAll(std::string_view events) {

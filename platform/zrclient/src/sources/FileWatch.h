@@ -32,6 +32,9 @@ class FileWatch {
     /// first one. Costs one read() while nothing happens.
     [[nodiscard]] bool changed();
 
+    /// What becomes readable when changed() may become true; none when it is blind.
+    [[nodiscard]] UniqueFd sign() const;
+
     /// True when a directory cannot be watched. Then changed() is always true,
     /// since an unnoticed change would be worse than a needless reading.
     [[nodiscard]] bool isBlind() const noexcept { return !inotify_; }

@@ -39,6 +39,14 @@ bool JsonTreeSource::changed() {
     return readAgain_ || watch_.changed() || (nameless_ && !getSystemName().empty());
 }
 
+ChangeSigns JsonTreeSource::signs() {
+    ChangeSigns signs{.descriptor = watch_.sign(), .askAt = std::nullopt};
+    if (readAgain_ || nameless_ || !signs.descriptor) {
+        signs.askNoLaterThan(std::chrono::steady_clock::now() + slowest);
+    }
+    return signs;
+}
+
 std::shared_ptr<const Snapshot> JsonTreeSource::read() {
     try {
         readAgain_ = false;

@@ -20,6 +20,7 @@ class JsonTreeSource : public SnapshotSource {
     explicit JsonTreeSource(const std::string& path) : JsonTreeSource(path, path) {}
 
     [[nodiscard]] bool changed() override;
+    [[nodiscard]] ChangeSigns signs() override;
     [[nodiscard]] std::shared_ptr<const Snapshot> read() override;
 
   private:

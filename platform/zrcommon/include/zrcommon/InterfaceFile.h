@@ -18,6 +18,15 @@ struct InterfaceFile {
     /// "..", and those with a "/" or a control character.
     [[nodiscard]] static std::optional<std::string> path(const std::string& directory,
                                                          const std::string& interfaceName);
+
+    /// What keeps a process from changing a file.
+    struct Obstacle {
+        std::string text;     ///< with the file's path
+        bool denied = false;  ///< the user of the process lacks the right
+    };
+    /// What keeps this process, with its effective user, from changing the file at a path;
+    /// none as far as can be seen.
+    [[nodiscard]] static std::optional<Obstacle> obstacle(const std::string& path);
 };
 
 }  // namespace ZR
