@@ -1,4 +1,4 @@
-#include "AssociationRequests.h"
+#include "Requests.h"
 
 #include <algorithm>
 #include <optional>

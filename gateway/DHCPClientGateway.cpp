@@ -4,9 +4,8 @@
 #include <exception>
 #include <string>
 
-#include "AssociationRequests.h"
-#include "InstanceRequests.h"
 #include "Modification.h"
+#include "Requests.h"
 #include "providerutilities/ProviderUtilities.h"
 #include "providerutilities/Refusal.h"
 #include "zrclient/OneMoment.h"

@@ -1,4 +1,4 @@
-#include "InstanceRequests.h"
+#include "Requests.h"
 
 #include "Completion.h"
 #include "Delivery.h"

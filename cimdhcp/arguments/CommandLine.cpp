@@ -7,7 +7,6 @@
 
 #include "arguments/HelpFormatter.h"
 #include "arguments/OptionGroups.h"
-#include "arguments/OptionRules.h"
 #include "client/InterfaceState.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"

@@ -1,4 +1,4 @@
-#include "arguments/OptionRules.h"
+#include "arguments/OptionGroups.h"
 
 #include <stdexcept>
 #include <string>

@@ -1,4 +1,4 @@
-#include "arguments/PathArgument.h"
+#include "arguments/ArgumentValue.h"
 
 #include <algorithm>
 #include <string_view>

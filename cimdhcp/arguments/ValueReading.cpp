@@ -1,4 +1,4 @@
-#include "arguments/ValueReading.h"
+#include "arguments/ArgumentValue.h"
 
 #include <array>
 #include <charconv>

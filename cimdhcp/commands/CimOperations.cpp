@@ -1,7 +1,6 @@
 #include "commands/CimOperations.h"
 
-#include "arguments/PathArgument.h"
-#include "arguments/ValueReading.h"
+#include "arguments/ArgumentValue.h"
 #include "cimom/ClassDeclaration.h"
 #include "cimom/Instance.h"
 #include "cimom/Requests.h"

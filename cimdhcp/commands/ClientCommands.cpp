@@ -11,14 +11,11 @@
 #include "commands/DiagnosticText.h"
 #include "commands/Findings.h"
 #include "commands/Graph.h"
-#include "commands/GraphDrawing.h"
 #include "commands/Overview.h"
 #include "commands/PlatformSetup.h"
 #include "commands/Profiles.h"
 #include "commands/Rename.h"
-#include "commands/ResponseOrder.h"
 #include "commands/ResponseText.h"
-#include "commands/ServerFindings.h"
 #include "text/JsonText.h"
 
 namespace cimdhcp {

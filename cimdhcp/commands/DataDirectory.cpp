@@ -1,4 +1,4 @@
-#include "commands/DataDirectory.h"
+#include "commands/Findings.h"
 
 #include <unistd.h>
 

@@ -6,8 +6,12 @@
 #include <functional>
 #include <vector>
 
+#include "arguments/Commands.h"
 #include "client/ServerUrl.h"
 #include "commands/ClientCommands.h"
+#include "commands/Outputs.h"
+#include "text/Failure.h"
+#include "text/Presentation.h"
 
 namespace cimdhcp {
 
@@ -28,5 +32,12 @@ using AskServer = std::function<Outcome(const ServerUrl&)>;
 void askFleet(const std::vector<ServerUrl>& servers, std::size_t parallel, const AskServer& ask,
               const std::function<void(ServerReport&&)>& arrived,
               const std::atomic<bool>& interrupted);
+
+/// Carries out a command on the servers that the options name: on one that --connect
+/// names with the output of this machine, on several with that of FleetOutput. Returns how
+/// the program ends. Throws Failure for a fault of the only server, and for what is not
+/// the fault of a server.
+ExitStatus runRemotely(const CommandLine& line, const Presentation& presentation,
+                       const Outputs& outputs, const Style& errorStyle);
 
 }  // namespace cimdhcp

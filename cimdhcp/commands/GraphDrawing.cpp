@@ -1,4 +1,4 @@
-#include "commands/GraphDrawing.h"
+#include "commands/Graph.h"
 
 #include <spawn.h>
 #include <sys/wait.h>

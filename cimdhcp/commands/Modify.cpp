@@ -5,9 +5,8 @@
 #include <utility>
 #include <vector>
 
+#include "arguments/ArgumentValue.h"
 #include "arguments/Commands.h"
-#include "arguments/PathArgument.h"
-#include "arguments/ValueReading.h"
 #include "cimom/ClassDeclaration.h"
 #include "cimom/Names.h"
 #include "client/Client.h"

@@ -1,9 +1,8 @@
-#include "commands/RemoteRun.h"
+#include "commands/Fleet.h"
 
 #include <ostream>
 
 #include "commands/ClientCommands.h"
-#include "commands/Fleet.h"
 #include "commands/FleetOutput.h"
 #include "commands/Interruption.h"
 #include "commands/ServerAccess.h"

@@ -1,4 +1,4 @@
-#include "commands/ResponseOrder.h"
+#include "commands/ResponseText.h"
 
 #include <algorithm>
 #include <optional>
@@ -7,7 +7,6 @@
 #include "cimom/ObjectPathText.h"
 #include "client/Response.h"
 #include "text/Columns.h"
-#include "text/NaturalOrder.h"
 #include "text/ValueMeaning.h"
 
 namespace cimdhcp {

@@ -9,7 +9,7 @@
 #include "client/Response.h"
 #include "client/StatusMessage.h"
 #include "text/DisplayText.h"
-#include "text/InstanceJson.h"
+#include "text/JsonText.h"
 #include "text/MofText.h"
 #include "text/ValueMeaning.h"
 

@@ -1,4 +1,4 @@
-#include "commands/ServerFindings.h"
+#include "commands/Findings.h"
 
 #include <algorithm>
 #include <array>

@@ -4,9 +4,9 @@
 #include <cstddef>
 #include <functional>
 #include <string>
+#include <string_view>
 #include <vector>
 
-#include "text/NaturalOrder.h"
 #include "text/Table.h"
 
 namespace cimdhcp {
@@ -62,5 +62,9 @@ void sortBy(const std::string& wanted, const std::vector<Column<Row>>& columns,
     std::stable_sort(rows.begin(), rows.end(),
                      [&key](const Row& a, const Row& b) { return comesBefore(key(a), key(b)); });
 }
+
+/// Whether a text comes before another one for a person: numbers within them by
+/// their value ("eth2" before "eth10"), else byte by byte.
+[[nodiscard]] bool comesBefore(std::string_view a, std::string_view b) noexcept;
 
 }  // namespace cimdhcp

@@ -1,4 +1,4 @@
-#include "text/InstanceJson.h"
+#include "text/JsonText.h"
 
 #include <cmath>
 #include <string>

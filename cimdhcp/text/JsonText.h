@@ -7,9 +7,12 @@
 #include <variant>
 #include <vector>
 
+#include "cimom/Forward.h"
+
 namespace cimdhcp {
 
 struct Json;
+
 using JsonList = std::vector<Json>;
 using JsonMembers = std::vector<std::pair<std::string, Json>>;  ///< of an object, in this order
 /// The text of a whole document, which becomes a part of another one.
@@ -32,5 +35,10 @@ struct Json : std::variant<std::nullptr_t, bool, std::int64_t, std::uint64_t, do
 [[nodiscard]] std::string jsonText(const Json& value);
 /// The same on one line.
 [[nodiscard]] std::string jsonLine(const Json& value);
+
+/// {"path", "class", "properties": {NAME: {"type", "value"}}}. What is null stays
+/// null. References are path texts, embedded instances objects of this form, and reals
+/// that are not numbers the texts "NaN", "INF" and "-INF".
+[[nodiscard]] Json instanceJson(const cimom::Instance& instance);
 
 }  // namespace cimdhcp

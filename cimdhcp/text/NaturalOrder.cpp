@@ -1,4 +1,4 @@
-#include "text/NaturalOrder.h"
+#include "text/Columns.h"
 
 #include <algorithm>
 

@@ -1,7 +1,6 @@
 #include "broker/Broker.h"
 
-#include "broker/BrokerEncapsulation.h"
-#include "broker/BrokerThreads.h"
+#include "broker/BrokerTables.h"
 #include "broker/RequestScope.h"
 #include "broker/objects/BrokerContext.h"
 

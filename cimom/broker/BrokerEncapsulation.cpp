@@ -1,10 +1,9 @@
-#include "broker/BrokerEncapsulation.h"
+#include "broker/BrokerTables.h"
 
 #include <cstdarg>
 #include <utility>
 
 #include "broker/Broker.h"
-#include "broker/BrokerMessages.h"
 #include "broker/BrokerText.h"
 #include "broker/BrokerTypes.h"
 #include "broker/RequestScope.h"

@@ -1,4 +1,4 @@
-#include "broker/BrokerMessages.h"
+#include "broker/BrokerText.h"
 
 #include <vector>
 

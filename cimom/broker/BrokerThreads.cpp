@@ -1,4 +1,4 @@
-#include "broker/BrokerThreads.h"
+#include "broker/BrokerTables.h"
 
 #include <pthread.h>
 

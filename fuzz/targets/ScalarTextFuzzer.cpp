@@ -6,7 +6,7 @@
 #include <cmath>
 
 #include "Input.h"
-#include "arguments/ValueReading.h"
+#include "arguments/ArgumentValue.h"
 #include "cimom/DateTimeText.h"
 #include "cimxml/XmlDocument.h"
 #include "text/DisplayText.h"

@@ -3,7 +3,7 @@
 # program shows is compared with what the client and the kernel say.
 #
 # Usage: dhcp-events.sh PATH-OF-cimdhcp PATH-OF-tree-on-request CLIENT EVENTS
-# CLIENT: one of the files in clients/, or NetworkManager-PROGRAM; EVENTS: life (leases of
+# CLIENT: one of the set-ups of dhcp-clients.sh, or NetworkManager-PROGRAM; EVENTS: life (leases of
 # ten minutes) or end (of twenty seconds, which end).
 set -euo pipefail
 
@@ -13,10 +13,9 @@ kind=$3
 events=$4
 subject=$kind
 here=$(dirname "$0")
-# shellcheck disable=SC2034 # the clients use it
-clients=$here/clients
 source "$here/dhcp-laboratory.sh"
 source "$here/dhcp-truth.sh"
+source "$here/dhcp-clients.sh"
 
 # A client has the functions start_client, which returns while it asks, stop_client, which
 # gives the lease back, said_address and said_server; renew_client if it can be told to.
@@ -34,7 +33,7 @@ drops_address=yes     # whether it takes its address away when the cable is out
 loses_name=no         # whether nothing ties it to its link then
 asked_on_bus=()       # the names of its processes that respond on the system bus
 follows_name=yes      # whether it goes on when its link gets another name
-source "$clients/${kind%-@(dhclient|dhcpcd)}.sh"
+"set_up_${kind%-@(dhclient|dhcpcd)}"
 
 leased() {
     local address

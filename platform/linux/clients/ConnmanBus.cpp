@@ -1,4 +1,4 @@
-#include "clients/ConnmanBus.h"
+#include "clients/ManagerBuses.h"
 
 #include <optional>
 #include <string>

@@ -9,7 +9,6 @@
 #include <cstddef>
 #include <utility>
 
-#include "clients/DhclientOptions.h"
 #include "facts/Lease.h"
 #include "formats/Numbers.h"
 

@@ -1,4 +1,4 @@
-#include "clients/DhclientOptions.h"
+#include "clients/DhclientLease.h"
 
 #include <algorithm>
 #include <array>

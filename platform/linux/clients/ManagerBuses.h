@@ -7,12 +7,27 @@
 #include <string_view>
 
 #include "clients/BusRequest.h"
-#include "clients/ConnmanBus.h"
-#include "clients/NetworkManagerBus.h"
 #include "clients/NetworkdBus.h"
 #include "facts/ClientFacts.h"
 
 namespace ZR::Live {
+
+/// Asks the NetworkManager of this machine for its devices, their leases, and what of its
+/// profiles it has applied to them: { "objects": as of org.freedesktop.DBus.ObjectManager,
+/// "applied": by the paths of devices }.
+[[nodiscard]] BusResponse askNetworkManager(BusRequests::Deadline deadline);
+
+/// Puts in the place of what its state files tell what it says itself. Returns why that
+/// cannot be used, empty when it can; then nothing was changed.
+[[nodiscard]] std::string_view addNetworkManagerDescription(std::string_view json,
+                                                            ClientFacts& facts);
+
+/// Asks the connman of this machine for its services: an array of [path, properties].
+[[nodiscard]] BusResponse askConnman(BusRequests::Deadline deadline);
+
+/// Adds the links on which connman asks for addresses or has them, and those that it got. It
+/// names no servers and no times. Returns why the text cannot be used, empty when it can.
+[[nodiscard]] std::string_view addConnmanServices(std::string_view json, ClientFacts& facts);
 
 /// Asks those managers over the system bus that run and can be asked there: they know more
 /// than their files tell. One that does not respond in time is left alone for a while, as

@@ -1,4 +1,4 @@
-#include "clients/NetworkManagerBus.h"
+#include "clients/ManagerBuses.h"
 
 #include <cstdint>
 #include <optional>

@@ -6,7 +6,7 @@
 #include <cstdint>
 #include <string_view>
 
-#include "clients/DhclientOptions.h"
+#include "clients/DhclientLease.h"
 #include "formats/Numbers.h"
 
 namespace ZR::Live {

@@ -1,8 +1,7 @@
 // The paths, class names and values that arguments are.
 #include <gtest/gtest.h>
 
-#include "arguments/PathArgument.h"
-#include "arguments/ValueReading.h"
+#include "arguments/ArgumentValue.h"
 #include "cimom/ClassDeclaration.h"
 #include "cimom/Instance.h"
 #include "cimom/ObjectPathText.h"

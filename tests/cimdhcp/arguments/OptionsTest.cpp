@@ -10,7 +10,6 @@
 
 #include "arguments/CommandLine.h"
 #include "arguments/OptionGroups.h"
-#include "arguments/OptionRules.h"
 #include "client/InterfaceState.h"
 #include "kit/FileContent.h"
 #include "kit/Refusal.h"

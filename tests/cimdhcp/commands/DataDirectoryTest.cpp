@@ -1,4 +1,4 @@
-#include "commands/DataDirectory.h"
+#include "commands/Findings.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>

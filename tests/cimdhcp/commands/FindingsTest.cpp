@@ -5,7 +5,6 @@
 
 #include "commands/DiagnosticText.h"
 #include "commands/Findings.h"
-#include "commands/MachineFindings.h"
 
 namespace cimdhcp {
 namespace {

@@ -6,7 +6,6 @@
 #include "cimom/ObjectPathText.h"
 #include "client/Response.h"
 #include "commands/ClassTable.h"
-#include "commands/ResponseOrder.h"
 #include "commands/ResponseText.h"
 #include "kit/SmallSchema.h"
 #include "text/Failure.h"

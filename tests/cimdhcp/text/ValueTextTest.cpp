@@ -9,10 +9,10 @@
 #include "cimom/Instance.h"
 #include "cimom/ObjectPathText.h"
 #include "kit/SmallSchema.h"
+#include "text/Columns.h"
 #include "text/DisplayText.h"
 #include "text/IntegerText.h"
 #include "text/MofText.h"
-#include "text/NaturalOrder.h"
 #include "text/Times.h"
 #include "text/ValueMeaning.h"
 

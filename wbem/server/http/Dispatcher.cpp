@@ -3,7 +3,7 @@
 #include <utility>
 
 #include "cimxml/Call.h"
-#include "operations/ModificationLog.h"
+#include "operations/Modification.h"
 
 namespace cimom::wbem {
 

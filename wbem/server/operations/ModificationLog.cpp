@@ -1,8 +1,7 @@
-#include "operations/ModificationLog.h"
+#include "operations/Modification.h"
 
 #include "cimom/ObjectPathText.h"
 #include "cimxml/Errors.h"
-#include "operations/Modification.h"
 
 namespace cimom::wbem {
 

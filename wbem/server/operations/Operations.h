@@ -6,7 +6,7 @@
 #include "cimxml/Call.h"
 #include "operations/Caller.h"
 #include "operations/EnumerationSessions.h"
-#include "operations/ModificationLog.h"
+#include "operations/Modification.h"
 #include "operations/ResponseBody.h"
 #include "wbem/Limits.h"
 

@@ -13,7 +13,7 @@
 #include "cimxml/Errors.h"
 #include "operations/Caller.h"
 #include "operations/EnumerationSessions.h"
-#include "operations/ModificationLog.h"
+#include "operations/Modification.h"
 #include "operations/Parameters.h"
 #include "operations/ResponseBody.h"
 #include "operations/Spool.h"

@@ -7,8 +7,7 @@
 
 #include "FakeBus.h"
 #include "LinuxSupport.h"
-#include "clients/ConnmanBus.h"
-#include "clients/NetworkManagerBus.h"
+#include "clients/ManagerBuses.h"
 #include "clients/NetworkdBus.h"
 
 namespace ZR::Live {

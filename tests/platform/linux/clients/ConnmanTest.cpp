@@ -7,7 +7,7 @@
 
 #include "LinuxSupport.h"
 #include "clients/Connman.h"
-#include "clients/ConnmanBus.h"
+#include "clients/ManagerBuses.h"
 #include "kit/Diagnostics.h"
 
 namespace ZR::Live {

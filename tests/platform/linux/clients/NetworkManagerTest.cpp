@@ -6,8 +6,8 @@
 
 #include "LinuxSupport.h"
 #include "Untrusted.h"
+#include "clients/ManagerBuses.h"
 #include "clients/NetworkManager.h"
-#include "clients/NetworkManagerBus.h"
 
 namespace ZR::Live {
 namespace {

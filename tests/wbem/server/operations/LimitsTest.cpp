@@ -4,7 +4,6 @@
 
 #include "cimom/ObjectPathText.h"
 #include "operations/Modification.h"
-#include "operations/ModificationLog.h"
 #include "wbem/Limits.h"
 #include "wbem/Server.h"
 
