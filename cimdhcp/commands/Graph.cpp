@@ -29,12 +29,24 @@ struct Fill {
     std::string_view classPart;  ///< stands in the class name
     std::string_view color;
 };
-constexpr std::array<Fill, 6> fills{{{"ComputerSystem", "#cfd8dc"},
+constexpr std::array<Fill, 7> fills{{{"DHCPLease", "#fff59d"},
+                                     {"ComputerSystem", "#cfd8dc"},
                                      {"DHCPProtocolEndpoint", "#a5d6a7"},
                                      {"IPProtocolEndpoint", "#c5e1a5"},
                                      {"ServiceAccessPoint", "#ffcc80"},
                                      {"Capabilities", "#b39ddb"},
                                      {"SettingData", "#90caf9"}}};
+
+/// What is at no end of an association, and what leads to another namespace.
+constexpr std::array<std::string_view, 4> leftOut{"QVXZR_DHCPInterface", "QVXZR_DHCPDiagnostic",
+                                                  "QVXZR_RegisteredDHCPClientProfile",
+                                                  "QVXZR_DHCPClientConformsToProfile"};
+
+bool isLeftOut(const std::string& className) {
+    return std::any_of(leftOut.begin(), leftOut.end(), [&className](std::string_view each) {
+        return cimom::sameName(className, each);
+    });
+}
 
 bool agrees(const cimom::ObjectPath& element, const cimom::ObjectPath& reference) {
     return cimom::sameName(element.className, reference.className) &&
@@ -134,6 +146,9 @@ Graph graphOfMachine(Client& client) {
     std::vector<cimom::ObjectPath> elements;
     std::vector<cimom::ObjectPath> associations;
     for (const ClassEntry& entry : client.servedClasses()) {
+        if (isLeftOut(entry.name)) {
+            continue;
+        }
         std::vector<cimom::ObjectPath>& paths = entry.association ? associations : elements;
         for (cimom::ObjectPath& path : client.pathsIn(entry.name)) {
             paths.push_back(std::move(path));

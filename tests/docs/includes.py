@@ -32,7 +32,7 @@ ORDERS = {
 # files or rooms. One that is mended has to leave the list. The library of the gateway is
 # made of the objects of all providers, which know each other by their factories alone: so
 # these links stay.
-EXCEPTIONS = {("gateway", "provider"), ("gateway", "neighbours")}
+EXCEPTIONS = {("gateway", "provider"), ("gateway", "neighbours"), ("gateway", "extensions")}
 
 INCLUDE = re.compile(r'^[ \t]*#[ \t]*include[ \t]*["<]([^">]+)[">]', re.MULTILINE)
 DIRECTORY = re.compile(r"(?:-I|-isystem )(\S+)")
