@@ -14,8 +14,10 @@
 #include "broker/objects/BrokerError.h"
 #include "broker/objects/BrokerInstance.h"
 #include "broker/objects/BrokerObjectPath.h"
+#include "broker/objects/BrokerSelectExp.h"
 #include "broker/objects/BrokerStatus.h"
 #include "cimom/ClassRepository.h"
+#include "cimom/Query.h"
 
 namespace cimom::broker {
 
@@ -114,14 +116,30 @@ CMPIDateTime* newDateTimeFromChars(const CMPIBroker* mb, const char* text, CMPIS
     });
 }
 
-/// Queries are not supported.
-CMPISelectExp* newSelectExp(const CMPIBroker*, const char*, const char*, CMPIArray** projection,
-                            CMPIStatus* rc) {
+CMPISelectExp* newSelectExp(const CMPIBroker* mb, const char* query, const char* language,
+                            CMPIArray** projection, CMPIStatus* rc) {
     if (projection != nullptr) {
         *projection = nullptr;
     }
-    setStatus(rc, CMPI_RC_ERR_NOT_SUPPORTED);
-    return nullptr;
+    return made<CMPISelectExp>(mb, rc, [=](const Broker& broker, CMPIrc& code) -> CMPISelectExp* {
+        try {
+            const Query parsed = Query::parse(orEmpty(language), orEmpty(query));
+            const auto& names = parsed.properties();
+            if (projection != nullptr && names) {
+                ArrayRecord* const list =
+                    makeArray(arena(), static_cast<CMPICount>(names->size()), CMPI_string);
+                for (CMPICount index = 0; index < list->size; ++index) {
+                    list->elements[index].state = CMPI_goodValue;
+                    list->elements[index].value.string = makeString(arena(), (*names)[index]);
+                }
+                *projection = list;
+            }
+        } catch (const QueryError& error) {
+            code = error.code;
+            return nullptr;
+        }
+        return makeSelectExp(arena(), broker.classes(), orEmpty(query), orEmpty(language));
+    });
 }
 
 /// The namespace must be given; all namespaces have the same classes. An unknown

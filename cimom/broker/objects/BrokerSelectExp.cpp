@@ -3,6 +3,9 @@
 #include "broker/Conversion.h"
 #include "broker/objects/BrokerInstance.h"
 #include "broker/objects/BrokerStatus.h"
+#include "cimom/ClassRepository.h"
+#include "cimom/Instance.h"
+#include "cimom/Query.h"
 
 namespace cimom::broker {
 
@@ -34,10 +37,27 @@ CMPISelectExp* clone(const CMPISelectExp* self, CMPIStatus* rc) {
     });
 }
 
-CMPIBoolean evaluate(const CMPISelectExp* self, const CMPIInstance*, CMPIStatus* rc) {
-    setStatus(
-        rc, selectExpOf(self) == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_ERR_NOT_SUPPORTED);
-    return 0;
+CMPIBoolean evaluate(const CMPISelectExp* self, const CMPIInstance* inst, CMPIStatus* rc) {
+    return guarded<CMPIBoolean>(rc, 0, [=](CMPIrc& code) -> CMPIBoolean {
+        const SelectExpRecord* const expression = selectExpOf(self);
+        const InstanceRecord* const instance = instanceOf(inst);
+        if (expression == nullptr || instance == nullptr) {
+            code = expression == nullptr ? CMPI_RC_ERR_INVALID_HANDLE
+                                         : CMPI_RC_ERR_INVALID_PARAMETER;
+            return 0;
+        }
+        try {
+            const Query query =
+                Query::parse(expression->language->view(), expression->query->view());
+            const bool matches = query.matches(toModel(*instance), [&](auto one, auto other) {
+                return expression->classes->isA(one, other);
+            });
+            return matches ? 1 : 0;
+        } catch (const QueryError& error) {
+            code = error.code;
+            return 0;
+        }
+    });
 }
 
 CMPIString* getString(const CMPISelectExp* self, CMPIStatus* rc) {

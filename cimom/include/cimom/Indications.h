@@ -4,6 +4,7 @@
 #include <functional>
 #include <memory>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "cimom/Instance.h"
@@ -16,8 +17,8 @@ struct IndicationFilter {
     std::string query;  ///< its FROM class is an indication class
     std::string queryLanguage = "WQL";
     /// Where what the indications tell of happens; at least one.
-    std::vector<std::string> sourceNameSpaces;
-    std::string owner;  ///< who subscribes, as providers are told; may be empty
+    std::vector<std::string> sourceNameSpaces = {};
+    std::string owner = {};  ///< who subscribes, as providers are told; may be empty
 };
 
 /// What a provider told, as one subscriber gets it.

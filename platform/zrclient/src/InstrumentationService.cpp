@@ -165,6 +165,11 @@ void InstrumentationService::Waiter::wake() const noexcept {
     static_cast<void>(::eventfd_write(event_.get(), 1));
 }
 
+void InstrumentationService::Waiter::refresh() noexcept {
+    refreshed_ = true;
+    wake();
+}
+
 void InstrumentationService::Waiter::stop() noexcept {
     stopped_ = true;
     wake();
@@ -198,6 +203,9 @@ std::shared_ptr<const Snapshot> InstrumentationService::Waiter::next(
     // once do not have the machine read for each.
     constexpr std::chrono::milliseconds pause(10);
     while (!stopped_) {
+        if (refreshed_.exchange(false)) {
+            return service_.current();
+        }
         if (auto newest = service_.published(); newest && newest != known) {
             return newest;
         }

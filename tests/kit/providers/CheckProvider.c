@@ -347,8 +347,35 @@ static void checkServices(const Call* call) {
                broker->eft->trace(broker, CMPI_LEV_INFO, "c", "text", NULL).rc ==
                    CMPI_RC_ERR_NOT_SUPPORTED);
     report(call, "newSelectExp",
-           broker->eft->newSelectExp(broker, "SELECT * FROM x", "WQL", &projection, &rc) == NULL &&
-               rc.rc == CMPI_RC_ERR_NOT_SUPPORTED && projection == NULL);
+           broker->eft->newSelectExp(broker, "SELECT * FROM x", "Latin", &projection, &rc) == NULL &&
+               rc.rc == CMPI_RC_ERR_QUERY_LANGUAGE_NOT_SUPPORTED && projection == NULL &&
+               broker->eft->newSelectExp(broker, "SELECT", "WQL", NULL, &rc) == NULL &&
+               rc.rc == CMPI_RC_ERR_INVALID_QUERY);
+    CMPISelectExp* all =
+        broker->eft->newSelectExp(broker, "SELECT * FROM Test_Types", "WQL", &projection, &rc);
+    report(call, "selectAll",
+           isOk(rc) && projection == NULL &&
+               isText(all->ft->getString(all, NULL), "SELECT * FROM Test_Types"));
+    CMPISelectExp* some = broker->eft->newSelectExp(
+        broker, "SELECT Id, Note FROM Test_Types WHERE Id = 'one'", "DMTF:CQL", &projection, &rc);
+    report(call, "selectSome",
+           isOk(rc) && projection != NULL && projection->ft->getSize(projection, NULL) == 2 &&
+               isText(projection->ft->getElementAt(projection, 1, NULL).value.string, "Note"));
+    CMPIObjectPath* types = broker->eft->newObjectPath(broker, "root/test", "Test_Types", NULL);
+    CMPIInstance* one = broker->eft->newInstance(broker, types, NULL);
+    one->ft->setProperty(one, "Id", (CMPIValue*)"one", CMPI_chars);
+    CMPISelectExp* copy = some->ft->clone(some, &rc);
+    report(call, "evaluate",
+           isOk(rc) && copy->ft->evaluate(copy, one, &rc) && isOk(rc) &&
+               all->ft->evaluate(all, one, NULL) && !some->ft->evaluate(some, NULL, &rc) &&
+               rc.rc == CMPI_RC_ERR_INVALID_PARAMETER && isOk(copy->ft->release(copy)));
+    one->ft->setProperty(one, "Id", (CMPIValue*)"two", CMPI_chars);
+    report(call, "evaluateOther", !some->ft->evaluate(some, one, &rc) && isOk(rc));
+    report(call, "normalForms",
+           some->ft->getDOC(some, &rc) == NULL && rc.rc == CMPI_RC_ERR_NOT_SUPPORTED &&
+               some->ft->getCOD(some, &rc) == NULL && rc.rc == CMPI_RC_ERR_NOT_SUPPORTED &&
+               !some->ft->evaluateUsingAccessor(some, NULL, NULL, &rc) &&
+               rc.rc == CMPI_RC_ERR_NOT_SUPPORTED);
     report(call, "capabilities",
            (broker->bft->brokerCapabilities & CMPI_MB_BasicRead) == CMPI_MB_BasicRead &&
                (broker->bft->brokerCapabilities & CMPI_MB_Indications) == CMPI_MB_Indications &&

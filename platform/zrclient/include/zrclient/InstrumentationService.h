@@ -65,6 +65,10 @@ class InstrumentationService {
         [[nodiscard]] std::shared_ptr<const Snapshot> next(
             const std::shared_ptr<const Snapshot>& known);
 
+        /// Lets next() return the newest snapshot at once, though it may be the known one.
+        /// From any thread.
+        void refresh() noexcept;
+
         /// Ends the wait, and all to come. From any thread.
         void stop() noexcept;
 
@@ -77,6 +81,7 @@ class InstrumentationService {
         InstrumentationService& service_;
         UniqueFd event_;
         std::atomic<bool> stopped_{false};
+        std::atomic<bool> refreshed_{false};
     };
 
     /// How often a source was read since the start.
