@@ -56,7 +56,7 @@ TEST(SubscriptionsEndToEnd, AClientThatBeginsOnAnInterfaceIsToldToTheListener) {
         made(manager, "CIM_IndicationSubscription",
              {reference("Filter", filter), reference("Handler", destination)});
 
-        run("ip link add test0 type dummy && ip link set test0 up");
+        run("ip link add test0 type bridge && ip link set test0 up");
         run("udhcpc -f -i test0 -s /bin/true >/dev/null 2>&1 &");
         const auto got = listener.await(1);
         ASSERT_EQ(got.size(), 1U) << testing::PrintToString(log.lines());
