@@ -110,8 +110,7 @@ ResponseBody getInstance(Request& request) {
 std::vector<NamedOperation> instanceOperations() {
     return {{"EnumerateInstances", enumerateInstances},
             {"EnumerateInstanceNames", enumerateInstanceNames},
-            {"GetInstance", getInstance},
-            {"ModifyInstance", modifyInstance}};
+            {"GetInstance", getInstance}};
 }
 
 }  // namespace cimom::wbem
