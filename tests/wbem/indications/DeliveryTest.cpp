@@ -11,8 +11,8 @@
 #include <cstdlib>
 #include <set>
 
-#include "indications/Listeners.h"
 #include "kit/FileContent.h"
+#include "kit/Listeners.h"
 #include "kit/RawServer.h"
 #include "kit/TemporaryDirectory.h"
 #include "kit/WireSupport.h"

@@ -7,8 +7,8 @@
 
 #include "cimom/ObjectManager.h"
 #include "cimom/Results.h"
-#include "indications/Listeners.h"
 #include "indications/Subscriptions.h"
+#include "kit/Listeners.h"
 #include "kit/Namespaces.h"
 #include "kit/TemporaryDirectory.h"
 

@@ -10,8 +10,8 @@
 #include "cimom/Indications.h"
 #include "cimom/ObjectManager.h"
 #include "cimom/Results.h"
-#include "indications/Listeners.h"
 #include "kit/FileContent.h"
+#include "kit/Listeners.h"
 #include "kit/RawServer.h"
 #include "kit/TemporaryDirectory.h"
 
