@@ -69,8 +69,8 @@ cimom::CommunicationMechanism communicationMechanism(const cimom::wbem::ServerSe
     constexpr std::uint16_t cimXml = 2;
     constexpr std::uint16_t noAuthentication = 2;
     constexpr std::uint16_t basicAuthentication = 3;
-    // Basic read, association traversal, query execution; of these, pulled.
-    std::vector<std::uint16_t> operations{2, 6, 7, 10, 11, 12};
+    // Basic read, association traversal, query execution, indications; of these, pulled.
+    std::vector<std::uint16_t> operations{2, 6, 7, 9, 10, 11, 12};
     if (!settings.readOnly) {
         // Basic write and instance manipulation.
         operations.insert(operations.end(), {3, 5});

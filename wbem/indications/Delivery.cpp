@@ -15,6 +15,8 @@ constexpr std::size_t deepestResponse = 16;
 constexpr std::size_t longestResponse = 64U << 10U;
 constexpr std::size_t shownReason = 200;
 constexpr std::chrono::minutes betweenDropLines(1);
+/// For the response to what is on its way at the end: without it, it is sent twice.
+constexpr std::chrono::seconds farewell(1);
 
 /// A listener that says this of an indication would say it again.
 bool isFinal(unsigned status) noexcept {
@@ -53,9 +55,12 @@ void Delivery::add(std::string indication) {
 }
 
 void Delivery::stop() noexcept {
-    stopping_ = true;
-    // The thread either sees it or waits already: the lock is free in between.
-    { const std::lock_guard lock(mutex_); }
+    {
+        const std::lock_guard lock(mutex_);
+        if (!stopping_.exchange(true)) {
+            stopped_ = Clock::now();
+        }
+    }
     wake_.notify_all();
 }
 
@@ -70,6 +75,11 @@ void Delivery::discard() {
 
 void Delivery::endThread() {
     stop();
+    {
+        std::unique_lock lock(mutex_);
+        wake_.wait_until(lock, stopped_ + farewell, [this] { return over_; });
+    }
+    interrupted_ = true;
     if (thread_.joinable()) {
         thread_.join();
     }
@@ -88,6 +98,8 @@ void Delivery::run() {
         }
         wake_.wait(lock, [this] { return stopping_ || queue_.front() != nullptr; });
         if (stopping_) {
+            over_ = true;
+            wake_.notify_all();
             return;
         }
         deliverFirst(lock);
@@ -169,7 +181,7 @@ Delivery::Attempt Delivery::post(const IndicationQueue::Entry& entry) {
         HttpSettings settings;
         settings.caCertificates = settings_.caCertificates;
         settings.longestResponse = longestResponse;
-        settings.interrupted = &stopping_;
+        settings.interrupted = &interrupted_;
         connection_.emplace(listener_.url, settings, deadline);
     }
     const ReceivedResponse response = connection_->post(

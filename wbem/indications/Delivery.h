@@ -71,7 +71,8 @@ class Delivery {
     const DeliverySettings settings_;
     const SubscriptionLog log_;
     const std::function<void()> failing_;
-    std::atomic<bool> stopping_{false};
+    std::atomic<bool> stopping_{false};     ///< no further attempt is begun
+    std::atomic<bool> interrupted_{false};  ///< one that is under way ends
 
     std::mutex mutex_;
     std::condition_variable wake_;
@@ -79,6 +80,8 @@ class Delivery {
     bool sending_ = false;     ///< the first one of the queue is on its way
     std::size_t dropped_ = 0;  ///< and not yet told of
     Clock::time_point tellAgain_{};
+    Clock::time_point stopped_{};
+    bool over_ = false;  ///< the thread is about to end
 
     // Of the thread alone.
     std::optional<HttpConnection> connection_;

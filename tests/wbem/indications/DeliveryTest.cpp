@@ -11,8 +11,8 @@
 #include <cstdlib>
 #include <set>
 
-#include "indications/Listeners.h"
 #include "kit/FileContent.h"
+#include "kit/Listeners.h"
 #include "kit/RawServer.h"
 #include "kit/TemporaryDirectory.h"
 #include "kit/WireSupport.h"
@@ -210,7 +210,7 @@ TEST_F(Deliveries, AListenerThatIsSilentKeepsNoOtherWaiting) {
 TEST_F(Deliveries, AFullQueueLosesTheOldestWhichTheNumbersAndTheLogTell) {
     settings_.queued = 3;
     KeptIndications listener(1);
-    settings_.retryInterval = std::chrono::milliseconds(1500);
+    settings_.retryInterval = milliseconds(4000);
     const auto delivery = to(listener.url());
     tell(*delivery, "0");
     log_.await("the listener has no room for more");

@@ -7,8 +7,8 @@
 
 #include "cimom/ObjectManager.h"
 #include "cimom/Results.h"
-#include "indications/Listeners.h"
 #include "indications/Subscriptions.h"
+#include "kit/Listeners.h"
 #include "kit/Namespaces.h"
 #include "kit/TemporaryDirectory.h"
 
@@ -56,7 +56,7 @@ TEST(SubscriptionsEndToEnd, AClientThatBeginsOnAnInterfaceIsToldToTheListener) {
         made(manager, "CIM_IndicationSubscription",
              {reference("Filter", filter), reference("Handler", destination)});
 
-        run("ip link add test0 type dummy && ip link set test0 up");
+        run("ip link add test0 type bridge && ip link set test0 up");
         run("udhcpc -f -i test0 -s /bin/true >/dev/null 2>&1 &");
         const auto got = listener.await(1);
         ASSERT_EQ(got.size(), 1U) << testing::PrintToString(log.lines());

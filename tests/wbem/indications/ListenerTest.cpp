@@ -3,7 +3,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "indications/Listeners.h"
+#include "kit/Listeners.h"
 #include "kit/WireSupport.h"
 
 namespace cimom::wbem {

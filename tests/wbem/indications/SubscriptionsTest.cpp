@@ -10,8 +10,8 @@
 #include "cimom/Indications.h"
 #include "cimom/ObjectManager.h"
 #include "cimom/Results.h"
-#include "indications/Listeners.h"
 #include "kit/FileContent.h"
+#include "kit/Listeners.h"
 #include "kit/RawServer.h"
 #include "kit/TemporaryDirectory.h"
 
@@ -396,7 +396,7 @@ TEST_F(SubscriptionRequests, CanBeSwitchedOffAndOn) {
 
 TEST_F(SubscriptionRequests, EndWithTheirDuration) {
     made(subscription(filter(), destination("http://127.0.0.1:1"),
-                      {number("SubscriptionDuration", Type::uint64, 1)}));
+                      {number("SubscriptionDuration", Type::uint64, 3)}));
     EXPECT_THAT(hub_->queries(), SizeIs(1));
     awaitSubscriptions(0);
     EXPECT_THAT(hub_->queries(), IsEmpty());
