@@ -77,17 +77,12 @@ bool acceptsServed(const Request& request, const char* wanted, const Class& serv
     return acceptsClass(request.broker, request.nameSpace, wanted, served.name, served.ancestors);
 }
 
-/// Whether the request's source is of a class that is at an end of an association. Throws
-/// Refusal when it is, and does not exist, whatever the filter: some object managers ask once
-/// for each association class, and a source that is not there is to have one response.
-bool hasPlaces(const Request& request) {
+/// Whether the request's source is of a class that is known here. Throws Refusal when it is,
+/// and does not exist, whatever the filter: some object managers ask once for each association
+/// class, and a source that is not there is to have one response.
+bool isKnown(const Request& request) {
     const ElementClass* served = findElement(classNameOf(request.path));
-    const auto classes = associationClasses();
-    if (served == nullptr ||
-        std::none_of(classes.begin(), classes.end(), [served](const AssociationClass& each) {
-            return equalNames(each.ends.front(), served->name) ||
-                   equalNames(each.ends.back(), served->name);
-        })) {
+    if (served == nullptr) {
         return false;
     }
     const Keys keys(request.path);
@@ -103,7 +98,7 @@ bool hasPlaces(const Request& request) {
 /// Hands over each association of the request's source with the place of its other end.
 template <typename Take>
 void forEachLink(const Request& request, const AssociationFilter& filter, const Take& take) {
-    if (!hasPlaces(request)) {
+    if (!isKnown(request)) {
         return;
     }
     for (const AssociationClass& association : associationClasses()) {

@@ -13,9 +13,7 @@
 
 namespace cimdhcp {
 
-struct MachineInterfaces;
 struct Response;
-struct ServedInstances;
 
 /// Sends the requests of the commands to the object manager of this process
 /// (EmbeddedClient) or to a WBEM server (RemoteClient). Every response has a CIM status;
@@ -36,8 +34,6 @@ class Client {
     [[nodiscard]] virtual std::vector<ClassEntry> servedClasses() = 0;
     /// False: no provider serves the class, so that an empty response means nothing.
     [[nodiscard]] virtual bool mayServe(std::string_view className) const = 0;
-    /// The interfaces of the machine, with nothing about DHCP yet.
-    [[nodiscard]] virtual MachineInterfaces interfaces(const ServedInstances& served) = 0;
     /// Where the ifcfg-INTERFACE files of the machine are, with "/" at the end; none
     /// for another machine than this one.
     [[nodiscard]] virtual std::optional<std::string> dataDir() const = 0;

@@ -6,15 +6,12 @@
 #include "cimom/MofError.h"
 #include "cimom/Names.h"
 #include "cimom/Results.h"
-#include "client/MachineInterfaces.h"
 #include "client/Response.h"
 #include "client/StatusMessage.h"
 #include "text/DisplayText.h"
 #include "tklogger/TKLogger.h"
-#include "zrclient/InstrumentationService.h"
 #include "zrcommon/LogLevel.h"
 #include "zrcommon/PlatformUtilities.h"
-#include "zrlinux/LiveSource.h"
 
 namespace cimdhcp {
 
@@ -72,14 +69,6 @@ const std::vector<cimom::Registration>& EmbeddedClient::registrations() const no
     return manager_->registrations();
 }
 
-void EmbeddedClient::awaitServiceProcessor(std::chrono::seconds patience) {
-    if (!ZR::InstrumentationService::process().awaiting()) {
-        return;
-    }
-    static_cast<void>(enumerateNames(classPath("QVXZR_DHCPProtocolEndpoint")));
-    ZR::InstrumentationService(ZR::openLiveSource()).settle(patience);
-}
-
 std::vector<ClassEntry> EmbeddedClient::servedClasses() {
     return cimdhcp::servedClasses(registrations(), repository());
 }
@@ -90,12 +79,6 @@ bool EmbeddedClient::mayServe(std::string_view className) const {
                            return registration.instance &&
                                   cimom::sameName(registration.className, className);
                        });
-}
-
-MachineInterfaces EmbeddedClient::interfaces(const ServedInstances& /*served*/) {
-    const auto snapshot = ZR::InstrumentationService::process().current();
-    const auto diagnostics = snapshot->diagnostics();
-    return {interfacesOf(*snapshot), {diagnostics.begin(), diagnostics.end()}};
 }
 
 std::optional<std::string> EmbeddedClient::dataDir() const {

@@ -1,6 +1,5 @@
 #pragma once
 
-#include <chrono>
 #include <memory>
 #include <string>
 #include <vector>
@@ -21,17 +20,9 @@ class EmbeddedClient : public Client {
     [[nodiscard]] const std::vector<cimom::Registration>& registrations() const noexcept;
     [[nodiscard]] cimom::ObjectManager& manager() noexcept { return *manager_; }
 
-    /// No request of the provider waits for the service processor, whose response comes later.
-    /// A program that ends after one request waits so long at most: a first request makes the
-    /// provider send its own to the service processor; a further one is sent after it, and its
-    /// response awaited, which comes after the response to the provider.
-    void awaitServiceProcessor(std::chrono::seconds patience);
-
     [[nodiscard]] ClassLookup classes() override { return repository(); }
     [[nodiscard]] std::vector<ClassEntry> servedClasses() override;
     [[nodiscard]] bool mayServe(std::string_view className) const override;
-    /// Those of the newest snapshot of the instrumentation.
-    [[nodiscard]] MachineInterfaces interfaces(const ServedInstances& served) override;
     [[nodiscard]] std::optional<std::string> dataDir() const override;
 
     Response enumerateNames(const cimom::ObjectPath& path) override;

@@ -9,6 +9,7 @@
 #include <variant>
 
 #include "cimom/ClassDeclaration.h"
+#include "cimom/DateTimeText.h"
 #include "text/ValueMeaning.h"
 
 namespace cimdhcp {
@@ -72,11 +73,72 @@ std::string_view systemOf(const cimom::Instance& instance) {
                : hostSystem;
 }
 
-std::optional<std::uint64_t> numberOf(const cimom::Instance& instance, std::string_view property) {
+template <typename Kind>
+std::optional<Kind> scalarOf(const cimom::Instance& instance, std::string_view property) {
     const cimom::Value* const value = instance.property(property);
     const cimom::Scalar* const scalar = value == nullptr ? nullptr : value->scalar();
-    const auto* const number = scalar == nullptr ? nullptr : std::get_if<std::uint64_t>(scalar);
-    return number == nullptr ? std::nullopt : std::optional(*number);
+    const auto* const held = scalar == nullptr ? nullptr : std::get_if<Kind>(scalar);
+    return held == nullptr ? std::nullopt : std::optional(*held);
+}
+
+std::optional<std::uint64_t> numberOf(const cimom::Instance& instance, std::string_view property) {
+    return scalarOf<std::uint64_t>(instance, property);
+}
+
+std::optional<std::int64_t> momentOf(const cimom::Instance& instance, std::string_view property) {
+    constexpr std::int64_t second = 1'000'000;
+    const auto moment = cimom::parseDateTime(text(instance, property));
+    return moment && !moment->interval ? std::optional(moment->microseconds / second)
+                                       : std::nullopt;
+}
+
+std::vector<std::uint64_t> numbersOf(const cimom::Instance& instance, std::string_view property) {
+    std::vector<std::uint64_t> numbers;
+    const cimom::Value* const value = instance.property(property);
+    const cimom::Array* const array = value == nullptr ? nullptr : value->array();
+    if (array == nullptr) {
+        return numbers;
+    }
+    for (const auto& element : *array) {
+        if (const auto* const number = std::get_if<std::uint64_t>(&element)) {
+            numbers.push_back(*number);
+        }
+    }
+    return numbers;
+}
+
+/// The address source that a value of AddressOrigin stands for.
+std::optional<std::uint64_t> addressSourceOf(std::optional<std::uint64_t> origin) {
+    using Source = ZR::NodeLexicon::AddressSource;
+    if (!origin) {
+        return std::nullopt;
+    }
+    for (auto source = static_cast<unsigned int>(Source::DHCP);
+         source <= static_cast<unsigned int>(Source::Other); ++source) {
+        if (ZR::NodeLexicon::addressOriginOf(source) == *origin) {
+            return source;
+        }
+    }
+    return static_cast<std::uint64_t>(Source::Unknown);
+}
+
+LeaseOverview leaseOf(const cimom::Instance& instance) {
+    LeaseOverview lease;
+    lease.family = text(instance, "Family");
+    lease.clientState = numberOf(instance, "ClientState");
+    lease.address = text(instance, "Address");
+    lease.server = text(instance, "ServerAddress");
+    lease.obtained = momentOf(instance, "LeaseObtained");
+    lease.renews = momentOf(instance, "RenewalTime");
+    lease.rebinds = momentOf(instance, "RebindingTime");
+    lease.expires = momentOf(instance, "LeaseExpires");
+    lease.options = numbersOf(instance, "OptionsReceived");
+    lease.clientIdentifier = text(instance, "ClientIdentifier");
+    lease.client = text(instance, "ClientName");
+    lease.process = numberOf(instance, "Process");
+    lease.source = text(instance, "Source");
+    lease.clientRuns = scalarOf<bool>(instance, "ClientRuns");
+    return lease;
 }
 
 LeaseOverview leaseOf(const ZR::Snapshot& snapshot, ZR::Snapshot::Index node) {
@@ -142,6 +204,52 @@ std::vector<InterfaceOverview> interfacesOf(const ZR::Snapshot& snapshot) {
         }
     }
     return interfaces;
+}
+
+std::vector<InterfaceOverview> interfacesOf(
+    const std::vector<cimom::Instance>& interfaces,
+    const std::optional<std::vector<cimom::Instance>>& leases) {
+    std::vector<InterfaceOverview> overviews;
+    std::unordered_map<std::string, std::size_t> places;  // by idOf()
+    for (const cimom::Instance& interface : interfaces) {
+        std::string whole = text(interface, "InstanceID");
+        auto id = readInterfaceId(whole);
+        if (!id) {
+            continue;
+        }
+        InterfaceOverview overview;
+        overview.system = std::move(id->system);
+        overview.name = std::move(id->name);
+        overview.dhcp = scalarOf<bool>(interface, "DHCPEnabled");
+        overview.active = scalarOf<bool>(interface, "LinkUp");
+        overview.address = text(interface, "IPv4Address");
+        overview.addressSource = addressSourceOf(numberOf(interface, "AddressOrigin"));
+        if (leases) {
+            overview.leases.emplace();
+        }
+        places.emplace(std::move(whole), overviews.size());
+        overviews.push_back(std::move(overview));
+    }
+    const std::vector<cimom::Instance> nothing;
+    for (const cimom::Instance& lease : leases ? *leases : nothing) {
+        const auto place = places.find(text(lease, "InterfaceID"));
+        if (place != places.end()) {
+            overviews[place->second].leases->push_back(leaseOf(lease));
+        }
+    }
+    return overviews;
+}
+
+std::vector<ZR::Diagnostic> diagnosticsOf(const std::vector<cimom::Instance>& diagnostics) {
+    using Kind = ZR::Diagnostic::Kind;
+    std::vector<ZR::Diagnostic> known;
+    for (const cimom::Instance& each : diagnostics) {
+        const auto kind = numberOf(each, "Kind");
+        if (kind && *kind <= static_cast<std::uint64_t>(Kind::Note)) {
+            known.emplace_back(text(each, "Description"), static_cast<Kind>(*kind));
+        }
+    }
+    return known;
 }
 
 std::vector<InterfaceOverview> interfacesOf(

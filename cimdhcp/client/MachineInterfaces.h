@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "cimom/Instance.h"
+#include "zrclient/Diagnostic.h"
 #include "zrclient/NodeLexicon.h"
 #include "zrclient/Snapshot.h"
 
@@ -85,17 +86,27 @@ struct ServedInstances {
 /// servers and configuration names.
 [[nodiscard]] std::vector<InterfaceOverview> interfacesOf(const ZR::Snapshot& snapshot);
 
-/// The interfaces of another machine, as far as its provider tells: those that have a
-/// setting, in their order, with the addresses of their IP endpoints (none: these are not
-/// served). `processors` are the names of its service processors. What a tree alone tells
-/// is not known: links, and leases.
+/// The same of the interfaces and leases that a provider serves; none: it does not serve
+/// leases.
+[[nodiscard]] std::vector<InterfaceOverview> interfacesOf(
+    const std::vector<cimom::Instance>& interfaces,
+    const std::optional<std::vector<cimom::Instance>>& leases);
+
+/// The interfaces as far as a provider tells that serves only the classes of the standard:
+/// those that have a setting, in their order, with the addresses of their IP endpoints (none:
+/// these are not served). `processors` are the names of its service processors. Links and
+/// leases are not known.
 [[nodiscard]] std::vector<InterfaceOverview> interfacesOf(
     const std::vector<cimom::Instance>& settings,
     const std::optional<std::vector<cimom::Instance>>& ipEndpoints,
     const std::vector<std::string>& processors);
 
+/// Those of the diagnostics that a provider serves that are of a known kind.
+[[nodiscard]] std::vector<ZR::Diagnostic> diagnosticsOf(
+    const std::vector<cimom::Instance>& diagnostics);
+
 /// Puts what the provider tells beside the interfaces. Whether DHCP is on is taken from it
-/// where there is no tree to tell.
+/// where nothing else tells.
 void addServed(const ServedInstances& served, std::vector<InterfaceOverview>& interfaces);
 
 }  // namespace cimdhcp

@@ -12,7 +12,6 @@
 #include "cimxml/HttpStatus.h"
 #include "cimxml/OperationRequest.h"
 #include "cimxml/OperationResponse.h"
-#include "client/MachineInterfaces.h"
 #include "client/Response.h"
 #include "client/StatusMessage.h"
 #include "text/DisplayText.h"
@@ -313,18 +312,6 @@ std::vector<ClassEntry> RemoteClient::servedClasses() {
 
 bool RemoteClient::mayServe(std::string_view /*className*/) const {
     return true;
-}
-
-MachineInterfaces RemoteClient::interfaces(const ServedInstances& served) {
-    const std::vector<cimom::Instance> nothing;
-    const auto endpoints = instancesIn("QVXZR_IPProtocolEndpoint");
-    // A server without the class has no service processor to tell of.
-    const Response systems = enumerateNames(classPath("QVXZR_SPComputerSystem"));
-    std::vector<std::string> processors;
-    for (const auto& path : systems.paths) {
-        processors.push_back(heldText(path->key("Name")));
-    }
-    return {interfacesOf(served.settings ? *served.settings : nothing, endpoints, processors), {}};
 }
 
 std::optional<std::string> RemoteClient::dataDir() const {

@@ -34,7 +34,6 @@ class RemoteClient : public Client {
     /// Always true: only a response tells.
     [[nodiscard]] bool mayServe(std::string_view className) const override;
     /// What the interfaces' settings and IP endpoints tell.
-    [[nodiscard]] MachineInterfaces interfaces(const ServedInstances& served) override;
     [[nodiscard]] std::optional<std::string> dataDir() const override;
 
     Response enumerateNames(const cimom::ObjectPath& path) override;

@@ -13,6 +13,7 @@
 #include "commands/Graph.h"
 #include "commands/GraphDrawing.h"
 #include "commands/Overview.h"
+#include "commands/PlatformSetup.h"
 #include "commands/Rename.h"
 #include "commands/ResponseOrder.h"
 #include "commands/ResponseText.h"
@@ -32,9 +33,9 @@ class Execution {
         : client_(client), presentation_(presentation) {}
 
     Outcome operator()(const ShowCommand& /*command*/) const {
-        const ServedInstances served = askProvider(client_);
-        MachineInterfaces machine = client_.interfaces(served);
-        addServed(served, machine.interfaces);
+        // Those of a tree are told by the name that a person gave it.
+        MachineInterfaces machine =
+            askMachine(client_, treeName().empty() ? AskDiagnostics::Yes : AskDiagnostics::No);
         const std::int64_t now = presentation_.now;
         std::string diagnostics = diagnosticText(machine.diagnostics, machine.interfaces);
         if (!presentation_.count) {

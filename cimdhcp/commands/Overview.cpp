@@ -7,10 +7,13 @@
 
 #include "client/Client.h"
 #include "client/InterfaceState.h"
+#include "client/Response.h"
 #include "commands/DiagnosticText.h"
 #include "text/DisplayText.h"
+#include "text/Failure.h"
 #include "text/JsonText.h"
 #include "text/Times.h"
+#include "text/ValueMeaning.h"
 #include "zrclient/NodeLexicon.h"
 
 namespace cimdhcp {
@@ -167,12 +170,47 @@ Json boolJson(std::optional<bool> value) {
     return value ? Json(*value) : Json(nullptr);
 }
 
+/// A machine without the class has no service processor to tell of.
+std::vector<std::string> namesOfProcessors(Client& client) {
+    const Response systems = client.enumerateNames(client.classPath("QVXZR_SPComputerSystem"));
+    std::vector<std::string> names;
+    for (const auto& path : systems.paths) {
+        names.push_back(path ? heldText(path->key("Name")) : std::string());
+    }
+    return names;
+}
+
 }  // namespace
 
-ServedInstances askProvider(Client& client) {
-    return {client.instancesIn("QVXZR_DHCPProtocolEndpoint"),
-            client.instancesIn("QVXZR_DHCPRemoteServiceAccessPoint"),
-            client.instancesIn("QVXZR_DHCPSettingData")};
+MachineInterfaces askMachine(Client& client, AskDiagnostics diagnostics) {
+    const ServedInstances served{client.instancesIn("QVXZR_DHCPProtocolEndpoint"),
+                                 client.instancesIn("QVXZR_DHCPRemoteServiceAccessPoint"),
+                                 client.instancesIn("QVXZR_DHCPSettingData")};
+    MachineInterfaces machine;
+    using Instances = std::vector<cimom::Instance>;
+    const auto interfaces = client.instancesIn("QVXZR_DHCPInterface");
+    // A server that knows the class and has no provider of it gives none, too.
+    const bool told =
+        interfaces && (!interfaces->empty() || served.settings.value_or(Instances{}).empty());
+    if (told) {
+        machine.interfaces = interfacesOf(*interfaces, client.instancesIn("QVXZR_DHCPLease"));
+        const auto troubles = diagnostics == AskDiagnostics::Yes
+                                  ? client.instancesIn("QVXZR_DHCPDiagnostic")
+                                  : std::nullopt;
+        if (troubles) {
+            machine.diagnostics = diagnosticsOf(*troubles);
+        }
+    } else if (served.settings) {
+        machine.interfaces =
+            interfacesOf(*served.settings, client.instancesIn("QVXZR_IPProtocolEndpoint"),
+                         namesOfProcessors(client));
+    } else {
+        throw Failure(ExitStatus::notDone,
+                      "nothing tells of interfaces: no provider serves QVXZR_DHCPInterface or "
+                      "QVXZR_DHCPSettingData");
+    }
+    addServed(served, machine.interfaces);
+    return machine;
 }
 
 std::vector<Column<InterfaceOverview>> overviewColumns(std::int64_t now) {

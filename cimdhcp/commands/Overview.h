@@ -17,9 +17,14 @@ class Client;
 // `now` is the moment of the look, in seconds since the epoch: states and the ends of leases
 // are told from it.
 
-/// Asks the provider for what it serves. Throws Failure for any response that is neither
-/// OK nor says that the class is not served.
-[[nodiscard]] ServedInstances askProvider(Client& client);
+/// Whether what could not be read is asked for, too.
+enum class AskDiagnostics : bool { No, Yes };
+
+/// Asks the provider for all that it tells of interfaces: by its own classes, or as far as
+/// those of the standard tell where it does not serve these. Throws Failure for any response
+/// that is neither OK nor says that the class is not served, and where neither kind of
+/// classes is served.
+[[nodiscard]] MachineInterfaces askMachine(Client& client, AskDiagnostics diagnostics);
 
 /// The interfaces as a table, with a line below it when none of them uses DHCP;
 /// that line alone when there are none. The system stands in a column of its own

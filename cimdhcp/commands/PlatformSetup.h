@@ -15,6 +15,9 @@ namespace cimdhcp {
 /// A tree that cannot be read twice, as "-" for standard input, a pipe or a FIFO, is read
 /// once and whole into memory, where every copy of the platform finds it.
 ///
+/// Lets the first reading of each copy wait a second for a service processor, unless the
+/// environment tells how long.
+///
 /// Writes a line to `err` for each setting that cannot be used. Throws Failure
 /// when the tree is not a file of a JSON tree or the data directory is not a directory.
 void setUpPlatform(const Options& options, std::ostream& err);

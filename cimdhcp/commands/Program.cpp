@@ -33,14 +33,9 @@ namespace cimdhcp {
 
 namespace {
 
-/// How long the service processor may take.
-constexpr std::chrono::seconds patience(1);
-
 std::unique_ptr<EmbeddedClient> openClient(const Options& options) {
-    auto client = std::make_unique<EmbeddedClient>(
+    return std::make_unique<EmbeddedClient>(
         findDirectories(options, installations(executableFile())), options.nameSpace);
-    client->awaitServiceProcessor(patience);
-    return client;
 }
 
 /// Runs one command line on this machine.
@@ -58,7 +53,6 @@ class Execution {
             }
             service.useSource(ZR::openLiveSource(ZR::Explain::Yes));
         }
-        service.settle(patience);
         const auto snapshot = service.current();
         outputs_.out << ZR::toJson(*snapshot, ZR::getSystemName());
         tell(*snapshot);
@@ -85,9 +79,7 @@ class Execution {
 
     template <typename ClientCommand>
     void operator()(const ClientCommand& /*command*/) const {
-        if constexpr (!std::is_same_v<ClientCommand, ShowCommand>) {
-            tellOfTree();  // "show" has it with what else it tells of the machine
-        }
+        tellOfTree();
         const auto client = openClient(line_.options);
         const Outcome outcome = carryOut(line_.command, *client, presentation_);
         outputs_.out << outcome.text;

@@ -29,15 +29,22 @@ using conformance::textsOf;
 using ::testing::IsEmpty;
 using ::testing::Not;
 
-const Texts elementClasses{"QVXZR_ComputerSystem",       "QVXZR_SPComputerSystem",
-                           "QVXZR_IPProtocolEndpoint",   "QVXZR_IPAssignmentSettingData",
-                           "QVXZR_DHCPProtocolEndpoint", "QVXZR_DHCPCapabilities",
-                           "QVXZR_DHCPSettingData",      "QVXZR_DHCPRemoteServiceAccessPoint"};
+const Texts elementClasses{"QVXZR_ComputerSystem",
+                           "QVXZR_SPComputerSystem",
+                           "QVXZR_IPProtocolEndpoint",
+                           "QVXZR_IPAssignmentSettingData",
+                           "QVXZR_DHCPProtocolEndpoint",
+                           "QVXZR_DHCPCapabilities",
+                           "QVXZR_DHCPSettingData",
+                           "QVXZR_DHCPRemoteServiceAccessPoint",
+                           "QVXZR_DHCPLease",
+                           "QVXZR_DHCPInterface"};
 const Texts associationClasses{
     "QVXZR_DHCPElementCapabilities",     "QVXZR_HostedDHCPPoint",
     "QVXZR_DHCPRemoteHostedAccessPoint", "QVXZR_SAPSAPDependency",
     "QVXZR_DHCPOrderedComponent",        "QVXZR_DHCPRemoteAccessAvailableToElement",
-    "QVXZR_DHCPElementSettingData"};
+    "QVXZR_DHCPElementSettingData",      "QVXZR_DHCPLeaseOfEndpoint",
+    "QVXZR_DHCPClientConformsToProfile"};
 const Texts elementParents{"CIM_ManagedElement",
                            "CIM_EnabledLogicalElement",
                            "CIM_System",
@@ -60,9 +67,10 @@ const Texts associationParents{"CIM_Dependency",
                                "CIM_Component",
                                "CIM_OrderedComponent",
                                "CIM_ElementCapabilities",
-                               "CIM_ElementSettingData"};
+                               "CIM_ElementSettingData",
+                               "CIM_ElementConformsToProfile"};
 const Texts roles{"Antecedent",  "Dependent",      "ManagedElement", "Capabilities",
-                  "SettingData", "GroupComponent", "PartComponent"};
+                  "SettingData", "GroupComponent", "PartComponent",  "ConformantStandard"};
 constexpr Operation associationOperations[] = {Operation::associatorNames, Operation::associators,
                                                Operation::referenceNames, Operation::references};
 
@@ -380,10 +388,13 @@ TEST_P(ConformanceTest, BothEndsOfAnAssociationSeeEachOtherAndTheAssociation) {
                                          .association = name})),
                             ::testing::Contains(textOf(ends.at(1 - near))))
                     << textOf(source);
+                // It is in the namespace in which it is asked for.
+                cimom::Instance seen = association;
+                seen.path.nameSpace = source.nameSpace;
                 EXPECT_THAT(
                     textsOf(ask(
                         {.operation = Operation::references, .path = source, .association = name})),
-                    ::testing::Contains(textOf(association)))
+                    ::testing::Contains(textOf(seen)))
                     << textOf(source);
             }
         }

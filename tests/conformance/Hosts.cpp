@@ -165,7 +165,7 @@ const char* methodOf(Operation operation) {
 }
 
 cimom::wbem::OperationRequest messageFor(const Request& request) {
-    cimom::wbem::OperationRequest message(methodOf(request.operation), nameSpace);
+    cimom::wbem::OperationRequest message(methodOf(request.operation), request.path.nameSpace);
     switch (request.operation) {
         case Operation::enumerateNames:
             message.className("ClassName", request.path.className);
@@ -201,7 +201,7 @@ class Server : public Host {
   public:
     Response modify(const cimom::Instance& instance,
                     const std::optional<Texts>& properties) override {
-        cimom::wbem::OperationRequest message("ModifyInstance", nameSpace);
+        cimom::wbem::OperationRequest message("ModifyInstance", instance.path.nameSpace);
         message.namedInstance("ModifiedInstance", instance).texts("PropertyList", properties);
         const auto read = send(message);
         return {static_cast<CMPIrc>(read.code), read.description, {}, {}};
@@ -212,10 +212,12 @@ class Server : public Host {
         Response response{static_cast<CMPIrc>(read.code), read.description, {}, {}};
         for (const cimom::wbem::XmlElement& element : read.returned) {
             if (asksForNames(request.operation)) {
-                response.paths.push_back(cimom::wbem::readReturnedPath(element, nameSpace));
+                response.paths.push_back(
+                    cimom::wbem::readReturnedPath(element, request.path.nameSpace));
                 continue;
             }
-            response.instances.push_back(cimom::wbem::readReturnedInstance(element, nameSpace));
+            response.instances.push_back(
+                cimom::wbem::readReturnedInstance(element, request.path.nameSpace));
             if (request.operation == Operation::get) {
                 // The response has the class alone.
                 cimom::Instance& instance = response.instances.back();

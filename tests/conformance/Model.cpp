@@ -34,6 +34,10 @@ cimom::NamedValue truth(const std::string& name, bool value) {
     return {name, {cimom::Type::boolean, false, cimom::Scalar(value)}};
 }
 
+cimom::NamedValue moment(const std::string& name, const std::string& value) {
+    return {name, {cimom::Type::datetime, false, cimom::Scalar(value)}};
+}
+
 cimom::NamedValue reference(const std::string& name, const cimom::ObjectPath& path) {
     return {name,
             {cimom::Type::reference, false,
@@ -43,6 +47,10 @@ cimom::NamedValue reference(const std::string& name, const cimom::ObjectPath& pa
 bool isIn(const Texts& names, const std::string& name) {
     return std::any_of(names.begin(), names.end(),
                        [&name](const std::string& each) { return cimom::sameName(each, name); });
+}
+
+bool hasLease(const Interface& interface) {
+    return interface.dhcp && !interface.address.empty();
 }
 
 bool accepts(const Name& wanted, const std::string& name) {
@@ -61,6 +69,12 @@ Model::Model(std::vector<Interface> interfaces, const std::string& hostName,
             {text("CreationClassName", className), text("Name", name), text("ElementName", name),
              text("NameFormat", "Other"), numbers("Dedicated", {dedicated})});
     };
+    profile_ = add("QVXZR_RegisteredDHCPClientProfile", {"InstanceID"},
+                   {text("InstanceID", "QVXZR:DHCP Client"),
+                    text("ElementName", "DHCP Client Profile"), number("SpecificationType", 2),
+                    number("RegisteredOrganization", 2), text("RegisteredName", "DHCP Client"),
+                    text("RegisteredVersion", "1.0.4"), numbers("AdvertiseTypes", {2})});
+    objects_.at(profile_).path.nameSpace = "root/interop";
     const std::size_t host = addComputer(computerSystem, hostName_, 0);
     const std::size_t serviceProcessor =
         addComputer(serviceProcessorSystem, serviceProcessorName, 28);
@@ -115,6 +129,14 @@ void Model::addInterface(const Interface& interface, std::size_t host,
                                         text("ElementName", name), number("AddressOrigin", 4)});
     link("QVXZR_DHCPOrderedComponent", "GroupComponent", assignment, "PartComponent", setting,
          {number("AssignedSequence", 1, cimom::Type::uint64)});
+    std::vector<cimom::NamedValue> known{text("InstanceID", settingId), text("ElementName", name),
+                                         truth("DHCPEnabled", interface.dhcp),
+                                         truth("LinkUp", true),
+                                         number("AddressOrigin", interface.dhcp ? 4 : 3)};
+    if (!interface.address.empty()) {
+        known.push_back(text("IPv4Address", interface.address));
+    }
+    add("QVXZR_DHCPInterface", {"InstanceID"}, known);
     // The IP side: of every interface with an address.
     std::optional<std::size_t> ipEndpoint;
     if (!interface.address.empty()) {
@@ -148,6 +170,19 @@ void Model::addInterface(const Interface& interface, std::size_t host,
              "Dependent", *endpoint);
         link("QVXZR_DHCPElementSettingData", "ManagedElement", *endpoint, "SettingData", setting,
              {number("IsCurrent", 1)});
+        link("QVXZR_DHCPClientConformsToProfile", "ConformantStandard", profile_, "ManagedElement",
+             *endpoint);
+        if (hasLease(interface)) {
+            const std::size_t lease =
+                add("QVXZR_DHCPLease", {"InstanceID"},
+                    {text("InstanceID", settingId + "%IPv4%dhclient"), text("ElementName", name),
+                     text("InterfaceID", settingId), text("Family", "IPv4"),
+                     number("ClientState", 8), text("Address", interface.address),
+                     moment("LeaseExpires", "99991231235959.000000+000"),
+                     numbers("OptionsReceived", {1, 51}), text("ClientName", "dhclient"),
+                     number("Process", 412, cimom::Type::uint32), truth("ClientRuns", true)});
+            link("QVXZR_DHCPLeaseOfEndpoint", "Antecedent", *endpoint, "Dependent", lease);
+        }
         if (ipEndpoint) {
             link("QVXZR_SAPSAPDependency", "Antecedent", *ipEndpoint, "Dependent", *endpoint);
         }
@@ -184,6 +219,19 @@ std::vector<test::Json> Model::tree() const {
         if (!interface.address.empty()) {
             node["properties"]["IPv4Address"] = interface.address;
         }
+        if (hasLease(interface)) {
+            node["children"] = {{{"type", "DHCPLease"},
+                                 {"description", "DHCP lease"},
+                                 {"properties",
+                                  {{"Family", "IPv4"},
+                                   {"ClientState", 8},
+                                   {"Address", interface.address},
+                                   {"LeaseExpires", 253402300799},
+                                   {"OptionsReceived", {1, 51}},
+                                   {"Client", "dhclient"},
+                                   {"Process", 412},
+                                   {"ClientRuns", true}}}}};
+        }
         (interface.ofServiceProcessor ? ofServiceProcessor : ofHost).push_back(std::move(node));
     }
     return {test::host(ofHost), test::serviceProcessor(ofServiceProcessor)};
@@ -215,7 +263,8 @@ Response Model::responseTo(const Request& request) const {
         case Operation::enumerateNames:
         case Operation::enumerate:
             for (const cimom::Instance& each : all()) {
-                if (isA(each, request.path.className)) {
+                if (each.path.nameSpace == request.path.nameSpace &&
+                    isA(each, request.path.className)) {
                     found.push_back(each);
                 }
             }
@@ -245,6 +294,9 @@ Response Model::responseTo(const Request& request) const {
                     const bool references = request.operation == Operation::referenceNames ||
                                             request.operation == Operation::references;
                     found.push_back(references ? each.association : other);
+                    if (references) {
+                        found.back().path.nameSpace = request.path.nameSpace;
+                    }
                 }
             }
             break;

@@ -39,7 +39,7 @@ class Model {
     [[nodiscard]] std::vector<test::Json> tree() const;
     void writeFiles(const std::string& directory) const;
 
-    /// Every object that is at the end of an association.
+    /// Every object that is not an association.
     [[nodiscard]] const std::vector<cimom::Instance>& objects() const { return objects_; }
     [[nodiscard]] const std::vector<Link>& links() const { return links_; }
     /// Objects and associations.
@@ -61,6 +61,7 @@ class Model {
     const cimom::ClassRepository& repository_;
     std::vector<cimom::Instance> objects_;
     std::vector<Link> links_;
+    std::size_t profile_ = 0;  // among the objects
 };
 
 }  // namespace conformance

@@ -91,15 +91,17 @@ TEST_P(GatewayWith, NamesAndInstancesAreTheSame) {
 }
 
 TEST_P(GatewayWith, AnEndpointHasItsOwnAssociatorsOnly) {
-    EXPECT_THAT(briefs(host_.associatorNames(endpoint("eth0"), {}).paths),
-                UnorderedElementsAre(
-                    "DHCPCapabilities eth0", "ComputerSystem " + hostName(),
-                    "IPProtocolEndpoint eth0", "DHCPRemoteServiceAccessPoint eth0_IPv4",
-                    "DHCPRemoteServiceAccessPoint eth0_IPv6", "DHCPSettingData Computer%eth0"));
+    EXPECT_THAT(
+        briefs(host_.associatorNames(endpoint("eth0"), {}).paths),
+        UnorderedElementsAre(
+            "DHCPCapabilities eth0", "ComputerSystem " + hostName(), "IPProtocolEndpoint eth0",
+            "DHCPRemoteServiceAccessPoint eth0_IPv4", "DHCPRemoteServiceAccessPoint eth0_IPv6",
+            "DHCPSettingData Computer%eth0", "RegisteredDHCPClientProfile QVXZR:DHCP Client"));
     // It has no address, and so no IP side.
     EXPECT_THAT(briefs(host_.associatorNames(endpoint("eth2"), {}).paths),
                 UnorderedElementsAre("DHCPCapabilities eth2", "ComputerSystem " + hostName(),
-                                     "DHCPSettingData Computer%eth2"));
+                                     "DHCPSettingData Computer%eth2",
+                                     "RegisteredDHCPClientProfile QVXZR:DHCP Client"));
     EXPECT_THAT(
         briefs(host_.associatorNames(accessPoint("my_nic_IPv4"), {}).paths),
         UnorderedElementsAre("ComputerSystem " + hostName(), "DHCPProtocolEndpoint my_nic"));
@@ -154,7 +156,7 @@ TEST_F(GatewayTest, NamesOfClassesAndKeysHaveNoCase) {
                        [](unsigned char letter) { return std::tolower(letter); });
     }
     EXPECT_THAT(host_.get(lower).instances, SizeIs(1));
-    EXPECT_THAT(host_.associatorNames(lower, {}).paths, SizeIs(6));
+    EXPECT_THAT(host_.associatorNames(lower, {}).paths, SizeIs(7));
 }
 
 TEST_F(GatewayTest, TellsAssociationsThatAreNotThere) {
@@ -214,7 +216,8 @@ INSTANTIATE_TEST_SUITE_P(
                  {"DHCPSettingData Computer%my_nic"}},
         Filtered{"Role",
                  {nullptr, nullptr, "managedelement", nullptr},
-                 {"DHCPCapabilities my_nic", "DHCPSettingData Computer%my_nic"}},
+                 {"DHCPCapabilities my_nic", "DHCPSettingData Computer%my_nic",
+                  "RegisteredDHCPClientProfile QVXZR:DHCP Client"}},
         Filtered{
             "ResultRole", {nullptr, nullptr, nullptr, "CAPABILITIES"}, {"DHCPCapabilities my_nic"}},
         Filtered{"OtherRole", {"CIM_Dependency", nullptr, "Antecedent", nullptr}, {}},

@@ -2,6 +2,7 @@
 
 #include <utility>
 
+#include "cimom/DateTimeText.h"
 #include "cimom/Names.h"
 #include "kit/StrictHost.h"
 #include "kit/StrictObjects.h"
@@ -47,6 +48,20 @@ CMPIString* newString(const CMPIBroker* broker, const char* text, CMPIStatus* st
     }
     setStatus(status, CMPI_RC_OK);
     return RequestObjects::make<StringObject>(text);
+}
+
+CMPIDateTime* newDateTimeFromChars(const CMPIBroker* broker, const char* text, CMPIStatus* status) {
+    const bool usable = hostOf(broker, "newDateTimeFromChars") != nullptr &&
+                        given(text, "newDateTimeFromChars", "text");
+    if (!usable || !cimom::parseDateTime(text)) {
+        if (usable) {
+            violations().add("newDateTimeFromChars was given \"" + std::string(text) + '"');
+        }
+        setStatus(status, CMPI_RC_ERR_INVALID_PARAMETER);
+        return nullptr;
+    }
+    setStatus(status, CMPI_RC_OK);
+    return RequestObjects::make<DateTimeObject>(text);
 }
 
 CMPIArray* newArray(const CMPIBroker* broker, CMPICount size, CMPIType type, CMPIStatus* status) {
@@ -140,6 +155,7 @@ const CMPIBrokerEncFT encapsulation = [] {
     table.newObjectPath = &newObjectPath;
     table.newString = &newString;
     table.newArray = &newArray;
+    table.newDateTimeFromChars = &newDateTimeFromChars;
     table.classPathIsA = &classPathIsA;
     return table;
 }();

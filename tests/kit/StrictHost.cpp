@@ -204,7 +204,11 @@ StrictHost::Response StrictHost::eachClass(
                                    const CMPIObjectPath*)>& call) {
     Response all;
     for (const cimom::Registration& registration : registrations_) {
-        if (!registration.instance || !repository_.isA(registration.className, path.className)) {
+        const auto& spaces = registration.nameSpaces;
+        if (!registration.instance || !repository_.isA(registration.className, path.className) ||
+            std::none_of(spaces.begin(), spaces.end(), [&path](const std::string& each) {
+                return cimom::sameName(each, path.nameSpace);
+            })) {
             continue;
         }
         cimom::ObjectPath ofSubclass = path;

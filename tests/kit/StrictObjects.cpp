@@ -90,6 +90,14 @@ const char* getCharPtr(const CMPIString* string, CMPIStatus* status) {
     return object == nullptr ? nullptr : object->text.data();
 }
 
+// Date-times.
+
+CMPIString* getStringFormat(const CMPIDateTime* moment, CMPIStatus* status) {
+    DateTimeObject* object = RequestObjects::get<DateTimeObject>(moment, "getStringFormat");
+    setStatus(status, object == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_OK);
+    return object == nullptr ? nullptr : RequestObjects::make<StringObject>(object->text);
+}
+
 // Arrays.
 
 CMPIStatus setElementAt(const CMPIArray* array, CMPICount index, const CMPIValue* value,
@@ -408,6 +416,12 @@ const CMPIStringFT StringObject::table = [] {
     return table;
 }();
 
+const CMPIDateTimeFT DateTimeObject::table = [] {
+    auto table = emptyTable<CMPIDateTimeFT>();
+    table.getStringFormat = &getStringFormat;
+    return table;
+}();
+
 const CMPIArrayFT ArrayObject::table = [] {
     auto table = emptyTable<CMPIArrayFT>();
     table.getSize = &getSize;
@@ -463,6 +477,11 @@ const CMPIResultFT ResultObject::table = [] {
 // Providers of old read the text straight out of the handle.
 StringObject::StringObject(std::string content)
     : CMPIString{nullptr, &table}, text(std::move(content)) {
+    hdl = text.data();
+}
+
+DateTimeObject::DateTimeObject(std::string content)
+    : CMPIDateTime{nullptr, &table}, text(std::move(content)) {
     hdl = text.data();
 }
 

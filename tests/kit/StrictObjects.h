@@ -91,6 +91,13 @@ struct StringObject : CMPIString {
     std::string text;
 };
 
+struct DateTimeObject : CMPIDateTime {
+    using Record = CMPIDateTime;
+    static const CMPIDateTimeFT table;
+    explicit DateTimeObject(std::string content);
+    std::string text;
+};
+
 struct PathObject : CMPIObjectPath {
     using Record = CMPIObjectPath;
     static const CMPIObjectPathFT table;

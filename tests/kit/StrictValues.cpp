@@ -23,7 +23,10 @@ using cimom::broker::withoutArray;
 CMPIValue toCmpi(const cimom::ClassRepository& repository, const cimom::Scalar& scalar,
                  cimom::Type type) {
     CMPIValue value{};
-    if (const auto* text = std::get_if<std::string>(&scalar)) {
+    const auto* text = std::get_if<std::string>(&scalar);
+    if (text != nullptr && type == cimom::Type::datetime) {
+        value.dateTime = RequestObjects::make<DateTimeObject>(*text);
+    } else if (text != nullptr) {
         value.string = RequestObjects::make<StringObject>(*text);
     } else if (const auto* path = std::get_if<std::shared_ptr<const cimom::ObjectPath>>(&scalar)) {
         value.ref = RequestObjects::make<PathObject>(repository, **path);
@@ -57,6 +60,12 @@ cimom::Scalar scalarFrom(const CMPIValue& value, CMPIType type, const char* func
         case CMPI_string:
             if (const auto* text = RequestObjects::get<StringObject>(value.string, function)) {
                 return text->text;
+            }
+            return std::monostate{};
+        case CMPI_dateTime:
+            if (const auto* moment =
+                    RequestObjects::get<DateTimeObject>(value.dateTime, function)) {
+                return moment->text;
             }
             return std::monostate{};
         case CMPI_ref:

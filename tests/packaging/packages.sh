@@ -122,21 +122,30 @@ wlan0      on    bound  NetworkManager  198.51.100.23  never       198.51.100.1 
 eth1       off   off    -               203.0.113.4    -           -                       -
 eth0: the configuration name is now "new", was "old" (/var/lib/dhcp-client-provider/ifcfg-eth0).
 CONFIG_NAME=new
+21
 15
-15
-2
+5
 == a setting that was changed survives a new installation
 LOG_LEVEL=4000
 == a library that is removed is taken out of the object manager
 sfcbrepos -f
 ./mofs/root/cimv2/10-dhcp-client.mof
+./mofs/root/cimv2/11-dhcp-extensions.mof
+./mofs/root/cimv2/12-dhcp-profile.mof
+./mofs/root/interop/12-dhcp-profile.mof
 ./regs/DHCPClientNeighbours.reg
 ./regs/DHCPClientProvider.reg
 sfcbrepos -f
 ./mofs/root/cimv2/10-dhcp-client.mof
+./mofs/root/cimv2/11-dhcp-extensions.mof
+./mofs/root/cimv2/12-dhcp-profile.mof
+./mofs/root/interop/12-dhcp-profile.mof
 ./regs/DHCPClientProvider.reg
 sfcbrepos -f
 ./mofs/root/cimv2/10-dhcp-client.mof
+./mofs/root/cimv2/11-dhcp-extensions.mof
+./mofs/root/cimv2/12-dhcp-profile.mof
+./mofs/root/interop/12-dhcp-profile.mof
 ./regs/DHCPClient.reg
 sfcbrepos -f
 == purge

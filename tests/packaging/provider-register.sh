@@ -27,7 +27,7 @@ check() { # NAME COMMAND...
 content() { # every file below a directory with its name and text, MOF classes left out
     (cd "$1" && find . -type f | LC_ALL=C sort | while read -r file; do
         echo "== $file"
-        case $file in *dhcp-client.mof) echo "(the classes)" ;; *) cat "$file" ;; esac
+        case $file in */1?-dhcp-*.mof) echo "(the classes)" ;; *) cat "$file" ;; esac
     done)
 }
 stamps() { find "$1" -printf '%P %i %T@\n' | LC_ALL=C sort; }
@@ -41,7 +41,9 @@ for type in sfcb pegasus; do
         cp "$directory/content" "$expected/$type"
     fi
     check "$type: writes what is expected" diff "$expected/$type" "$directory/content"
-    find "$stage" -name 10-dhcp-client.mof -exec cmp {} "$(dirname "$program")/schema/10-dhcp-client.mof" \; >"$directory/classes"
+    find "$stage" -name '1?-dhcp-*.mof' | while read -r file; do
+        cmp "$file" "$(dirname "$program")/schema/${file##*/}" || true
+    done >"$directory/classes"
     check "$type: stages the classes unchanged" test ! -s "$directory/classes"
     stamps "$stage" >"$directory/before"
     check "$type: registers again" env DESTDIR="$stage" "$program" -t "$type"
@@ -102,6 +104,16 @@ TEXT
 content "$stage" >"$directory/content"
 check "-n counts before the registration" diff "$directory/wanted" "$directory/content"
 
+# A namespace takes the place of the one of the DHCP clients, not of the one for discovery.
+DESTDIR=$stage "$program" -t sfcb -n root/c -r "$directory/one.registration" -m "$directory/things.mof" -d
+sed 's|root/b|root/interop|' "$directory/one.registration" >"$directory/two.registration"
+DESTDIR=$stage "$program" -t sfcb -n root/c -r "$directory/two.registration" -m "$directory/things.mof"
+check "-n leaves the interop namespace" grep -q 'namespace: root/c root/interop$' "$stage/var/lib/sfcb/stage/regs/ThingsLibrary.reg"
+check "classes are in both namespaces" cmp "$stage/var/lib/sfcb/stage/mofs/root/"{c,interop}/things.mof
+DESTDIR=$stage "$program" -t pegasus --interop root/PG_InterOp -r "$directory/two.registration" -m "$directory/things.mof"
+check "the interop namespace is what OpenPegasus calls it" \
+    grep -q 'Namespaces = {"root/a", "root/PG_InterOp"};' "$stage/var/lib/dhcp-client-provider/pegasus/ThingsLibrary.mof"
+
 # What it says.
 told() { # NAME ARGUMENTS... compares what is said below DESTDIR with standard input
     local name=$1
@@ -144,7 +156,8 @@ Registers CMPI providers with an object manager, or takes them out again.
                 the one that is installed when not given
   --exact       the library DHCPClientProvider and its neighbours, in place of DHCPClient
                 with its gateway
-  -n NAMESPACE  the namespace to serve instead of the one in the registration
+  -n NAMESPACE  the namespace to serve instead of the one in the registration; the
+                interop namespace stays
   -r FILE...    registration files; those of this package when not given
   -m FILE...    MOF files; those of this package when not given
   --sfcb-root DIR
@@ -425,6 +438,9 @@ DESTDIR=$stage "$program" -t sfcb -d -r "${program%/*}/schema/exact/DHCPClientNe
 (cd "$stage/var/lib/sfcb/stage" && find . -type f | LC_ALL=C sort) >"$directory/seen"
 check "the classes stay with a provider that stays" diff - "$directory/seen" <<'TEXT'
 ./mofs/root/cimv2/10-dhcp-client.mof
+./mofs/root/cimv2/11-dhcp-extensions.mof
+./mofs/root/cimv2/12-dhcp-profile.mof
+./mofs/root/interop/12-dhcp-profile.mof
 ./regs/DHCPClientProvider.reg
 TEXT
 DESTDIR=$stage "$program" -t sfcb -d

@@ -41,7 +41,8 @@ std::unique_ptr<SnapshotSource> openSourceOfSettings() {
 
 InstrumentationService& InstrumentationService::process() {
     // Destroyed when the library is unloaded, and its descriptors with it.
-    static InstrumentationService service;
+    static InstrumentationService service(nullptr,
+                                          PlatformSettings::process().serviceProcessorWait);
     return service;
 }
 
@@ -49,8 +50,9 @@ void InstrumentationService::setMachine(OpenMachine open) noexcept {
     openMachine = open;
 }
 
-InstrumentationService::InstrumentationService(std::unique_ptr<SnapshotSource> source)
-    : source_(std::move(source)) {}
+InstrumentationService::InstrumentationService(std::unique_ptr<SnapshotSource> source,
+                                               std::chrono::milliseconds firstWait)
+    : source_(std::move(source)), firstWait_(firstWait) {}
 
 std::shared_ptr<const Snapshot> InstrumentationService::published() {
     const std::lock_guard lock(snapshotMutex_);
@@ -86,6 +88,12 @@ std::shared_ptr<const Snapshot> InstrumentationService::readSource() {
 }
 
 std::shared_ptr<const Snapshot> InstrumentationService::current() {
+    using std::chrono::milliseconds;
+    if (firstWait_.load() > milliseconds(0)) {
+        if (const milliseconds wait = firstWait_.exchange(milliseconds(0)); wait.count() > 0) {
+            settle(wait);
+        }
+    }
     // Two requests never ask the source at once: the second one waits for a
     // reading under way and then polls for itself, so that what it gets is at
     // least as new as its call.

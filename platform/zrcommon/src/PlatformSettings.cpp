@@ -36,6 +36,21 @@ const char* applyLevel(std::string_view value, PlatformSettings& settings) {
     return nullptr;
 }
 
+/// Longer than that no service processor takes to respond.
+constexpr int longestWait = 60'000;
+
+const char* applyWait(std::string_view value, PlatformSettings& settings) {
+    int number = 0;
+    const auto [end, error] = std::from_chars(value.data(), value.data() + value.size(), number);
+    if (error != std::errc{} || end != value.data() + value.size() || number < 0 ||
+        number > longestWait) {
+        setDefault<&PlatformSettings::serviceProcessorWait>(settings);
+        return "not a number of milliseconds (from 0 to 60000)";
+    }
+    settings.serviceProcessorWait = std::chrono::milliseconds(number);
+    return nullptr;
+}
+
 template <auto sink>
 const char* applySink(std::string_view value, PlatformSettings& settings) {
     constexpr std::string_view file = "file:";
@@ -68,13 +83,14 @@ struct Setting {
     Apply apply;
 };
 
-constexpr std::array<Setting, 6> settingTable{{
+constexpr std::array<Setting, 7> settingTable{{
     {"DATA_DIR", "ZR_DATA_DIR", &applyDataDir},
     {"INSTRUMENTATION_TREE", "ZR_INSTRUMENTATION_TREE", &applyTree},
     {"LOG_LEVEL", "ZR_LOG_LEVEL", &applyLevel<&PlatformSettings::logLevel>},
     {"TRACE_LEVEL", "ZR_TRACE_LEVEL", &applyLevel<&PlatformSettings::traceLevel>},
     {"LOG_SINK", "ZR_LOG_SINK", &applySink<&PlatformSettings::logSink>},
     {"TRACE_SINK", "ZR_TRACE_SINK", &applySink<&PlatformSettings::traceSink>},
+    {"SERVICE_PROCESSOR_WAIT", "ZR_SERVICE_PROCESSOR_WAIT", &applyWait},
 }};
 
 std::string quoted(const std::string& text) {

@@ -117,6 +117,88 @@ TEST(InterfacesOfATree, AreThoseOfItsNetworks) {
     EXPECT_EQ(interfacesOf(*builder.build()), expected);
 }
 
+cimom::NamedValue textProperty(const std::string& name, const std::string& value) {
+    return {name, Value::ofString(value)};
+}
+
+cimom::NamedValue momentProperty(const std::string& name, const std::string& value) {
+    return {name, {Type::datetime, false, Scalar(value)}};
+}
+
+TEST(InterfacesThatAreServed, HaveWhatTheirInstancesTell) {
+    cimom::Instance eth0;
+    eth0.properties = {textProperty("InstanceID", "Computer%eth0"),
+                       {"DHCPEnabled", {Type::boolean, false, Scalar(true)}},
+                       {"LinkUp", {Type::boolean, false, Scalar(false)}},
+                       textProperty("IPv4Address", "192.0.2.17"),
+                       {"AddressOrigin", {Type::uint16, false, Scalar(std::uint64_t{4})}}};
+    cimom::Instance processors;
+    processors.properties = {textProperty("InstanceID", "BMC%eth0"),
+                             {"AddressOrigin", {Type::uint16, false, Scalar(std::uint64_t{7})}}};
+    cimom::Instance nameless;
+    nameless.properties = {textProperty("InstanceID", "eth0")};
+    std::vector<InterfaceOverview> expected{named(hostSystem, "eth0"),
+                                            named(serviceProcessorSystem, "eth0")};
+    expected[0].dhcp = true;
+    expected[0].active = false;
+    expected[0].address = "192.0.2.17";
+    expected[0].addressSource = 1;
+    expected[1].address = "";
+    expected[1].addressSource = 0;
+    const std::vector served{eth0, processors, nameless};
+    EXPECT_EQ(interfacesOf(served, std::nullopt), expected) << "leases are not served";
+
+    cimom::Instance lease;
+    lease.properties = {
+        textProperty("InterfaceID", "Computer%eth0"),
+        textProperty("Family", "IPv4"),
+        {"ClientState", {Type::uint16, false, Scalar(std::uint64_t{8})}},
+        textProperty("Address", "192.0.2.17"),
+        textProperty("ServerAddress", "192.0.2.1"),
+        momentProperty("LeaseObtained", "20231114221320.000000+000"),
+        momentProperty("RenewalTime", "20231114234320.000000+060"),
+        momentProperty("RebindingTime", "not a moment"),
+        momentProperty("LeaseExpires", "99991231235959.000000+000"),
+        {"OptionsReceived",
+         {Type::uint16, true, cimom::Array{std::uint64_t{1}, Scalar(), std::uint64_t{51}}}},
+        textProperty("ClientIdentifier", "01:02"),
+        textProperty("ClientName", "dhclient"),
+        {"Process", {Type::uint32, false, Scalar(std::uint64_t{412})}},
+        {"ClientRuns", {Type::boolean, false, Scalar(true)}},
+        textProperty("Source", "/leases")};
+    cimom::Instance elsewhere;
+    elsewhere.properties = {textProperty("InterfaceID", "Computer%eth9")};
+    LeaseOverview known;
+    known.family = "IPv4";
+    known.clientState = 8;
+    known.address = "192.0.2.17";
+    known.server = "192.0.2.1";
+    known.obtained = 1'700'000'000;
+    known.renews = 1'700'001'800;
+    known.expires = static_cast<std::int64_t>(ZR::NodeLexicon::never);
+    known.options = {1, 51};
+    known.clientIdentifier = "01:02";
+    known.client = "dhclient";
+    known.process = 412;
+    known.source = "/leases";
+    known.clientRuns = true;
+    expected[0].leases = {known};
+    expected[1].leases.emplace();
+    EXPECT_EQ(interfacesOf(served, std::vector{lease, elsewhere}), expected);
+}
+
+TEST(DiagnosticsThatAreServed, AreThoseOfKnownKinds) {
+    const auto diagnostic = [](std::uint64_t kind) {
+        cimom::Instance instance;
+        instance.properties = {textProperty("Description", "eth0: a lease has ended"),
+                               {"Kind", {Type::uint16, false, Scalar(kind)}}};
+        return instance;
+    };
+    EXPECT_EQ(
+        diagnosticsOf({diagnostic(5), diagnostic(8), cimom::Instance{}}),
+        std::vector{ZR::Diagnostic("eth0: a lease has ended", ZR::Diagnostic::Kind::LeaseEnded)});
+}
+
 /// A tree with interfaces eth0 and eth1, the second with leases.
 class LeasesOfATree : public ::testing::Test {
   protected:

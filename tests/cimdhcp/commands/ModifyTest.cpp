@@ -6,7 +6,6 @@
 #include "cimom/ClassDeclaration.h"
 #include "client/ClassLookup.h"
 #include "client/Client.h"
-#include "client/MachineInterfaces.h"
 #include "commands/CimOperations.h"
 #include "text/Failure.h"
 
@@ -69,9 +68,6 @@ class Shelf : public Client {
     // Not needed for this.
     [[nodiscard]] std::vector<ClassEntry> servedClasses() override { return {}; }
     [[nodiscard]] bool mayServe(std::string_view /*className*/) const override { return true; }
-    [[nodiscard]] MachineInterfaces interfaces(const ServedInstances& /*served*/) override {
-        return {};
-    }
     [[nodiscard]] std::optional<std::string> dataDir() const override { return std::nullopt; }
     Response enumerateNames(const cimom::ObjectPath& /*path*/) override { return {}; }
     Response enumerate(const cimom::ObjectPath& /*path*/) override { return {}; }

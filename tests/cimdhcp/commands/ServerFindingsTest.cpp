@@ -13,7 +13,6 @@
 #include "cimom/Instance.h"
 #include "cimom/Requests.h"
 #include "client/Client.h"
-#include "client/MachineInterfaces.h"
 #include "client/Response.h"
 
 namespace cimdhcp {
@@ -142,9 +141,6 @@ class Manager : public Client {
     }
     [[nodiscard]] std::vector<ClassEntry> servedClasses() override { return {}; }
     [[nodiscard]] bool mayServe(std::string_view /*className*/) const override { return true; }
-    [[nodiscard]] MachineInterfaces interfaces(const ServedInstances& /*served*/) override {
-        return {};
-    }
     [[nodiscard]] std::optional<std::string> dataDir() const override { return std::nullopt; }
     Response modify(const Instance& /*instance*/,
                     const std::vector<std::string>& /*properties*/) override {

@@ -233,9 +233,21 @@ TEST_F(OverviewCommands, ShowSaysThatAMachineIsEmpty) {
 }
 
 TEST_F(OverviewCommands, WhatIsNotServedIsNotKnown) {
-    ZR::Testing::writeFile(directory() / "some.registration",
-                           "[QVXZR_DHCPCapabilities]\nprovider: DHCPClientProvider\n"
-                           "location: DHCPClientProvider\ntype: instance\nnamespace: root/cimv2\n");
+    const auto registered = [this](const std::string& name, const std::string& provider,
+                                   const std::string& library) {
+        return '[' + name + "]\nprovider: " + provider + "\nlocation: " + library +
+               "\ntype: instance\nnamespace: root/cimv2\n";
+    };
+    const std::string file = directory() / "some.registration";
+    ZR::Testing::writeFile(
+        file, registered("QVXZR_DHCPCapabilities", "DHCPClientProvider", "DHCPClientProvider"));
+    EXPECT_EQ(run({"--registration-dir", directory().path(), "show"}),
+              (Ended{1, "",
+                     "cimdhcp: nothing tells of interfaces: no provider serves "
+                     "QVXZR_DHCPInterface or QVXZR_DHCPSettingData\n"}));
+    ZR::Testing::writeFile(
+        file, registered("QVXZR_DHCPLease", "DHCPClientExtensions", "DHCPClient") +
+                  registered("QVXZR_DHCPInterface", "DHCPClientExtensions", "DHCPClient"));
     EXPECT_EQ(run({"--registration-dir", directory().path(), "show"}),
               (Ended{0,
                      "INTERFACE  DHCP  STATE  CLIENT    ADDRESS       EXPIRES  SERVERS  "
@@ -243,6 +255,18 @@ TEST_F(OverviewCommands, WhatIsNotServedIsNotKnown) {
                      "eth0       on    bound  dhclient  192.0.2.17    never    ?        ?\n"
                      "eth1       off   off    -         198.51.100.4  -        ?        ?\n",
                      "cimdhcp: note: eth0, eth1: nothing tells SERVERS and CONFIGURATION NAME\n"}));
+}
+
+TEST_F(OverviewCommands, ShowTellsWhatTheStandardsClassesTellWhereNoOthersAreServed) {
+    EXPECT_EQ(run({"--exact", "show"}),
+              (Ended{0,
+                     "INTERFACE  DHCP  STATE  CLIENT  ADDRESS       EXPIRES  SERVERS             "
+                     "    CONFIGURATION NAME\n"
+                     "eth0       on    bound  ?       192.0.2.17    ?        192.0.2.1, "
+                     "2001:db8::1  -\n"
+                     "eth1       off   off    -       198.51.100.4  -        -                   "
+                     "    -\n",
+                     "cimdhcp: note: the server does not tell CLIENT and EXPIRES\n"}));
 }
 
 TEST_F(OverviewCommands, ShowFailsInANamespaceThatIsNotServed) {

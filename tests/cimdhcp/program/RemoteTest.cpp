@@ -19,15 +19,19 @@ using testing::StartsWith;
 
 class Remote : public test::ProgramTest {
   protected:
-    void serve(const std::vector<std::string>& further = {}) {
-        std::vector<std::string> arguments{"--tree", tree(),     "--data-dir", dataDir(),
-                                           "serve",  "--listen", "127.0.0.1:0"};
+    void serve(const std::vector<std::string>& further = {},
+               std::vector<std::string> arguments = {}) {
+        arguments.insert(arguments.end(), {"--tree", tree(), "--data-dir", dataDir(), "serve",
+                                           "--listen", "127.0.0.1:0"});
         arguments.insert(arguments.end(), further.begin(), further.end());
         server_ = std::make_unique<test::ServedProgram>(
             program(), arguments,
             std::vector<std::string>{"ZR_CONFIG=" + (directory() / "platform.conf"),
                                      "ZR_LOG_SINK=none"});
     }
+
+    /// A server with the classes of the standard alone.
+    void serveExactly() { serve({}, {"--exact"}); }
 
     /// Runs the program with --connect. It gets no tree and no data directory.
     [[nodiscard]] Ended ask(std::vector<std::string> arguments,
@@ -135,13 +139,42 @@ TEST_F(Remote, EveryInstanceIsAsOnTheMachineItself) {
 
 constexpr const char* notTold = "cimdhcp: note: the server does not tell CLIENT and EXPIRES\n";
 
+TEST_F(Remote, TheMachineIsShownAsItIsHere) {
+    writeConfiguration("eth0", "CONFIG_NAME=office\n");
+    const std::string machine =
+        test::computer("Computer", test::dhcpInterface("eth0", "192.0.2.1") + "," +
+                                       test::dhcpInterface("eth10", "192.0.2.2") +
+                                       R"(,{"type": "NetworkInterface", "description": "",
+                "properties": {"Name": "eth2", "DHCPEnabled": true, "AddressSource": 0,
+                               "InterfaceState": 1}, "children": [
+                {"type": "DHCPLease", "description": "DHCP lease",
+                 "properties": {"Family": "IPv4", "ClientState": 0, "Client": "udhcpc"}}]},
+               {"type": "NetworkInterface", "description": "", "properties": {"Name": "eth3"}})");
+    setTree(machine + "," + test::computer("BMC", test::dhcpInterface("eth0", "192.0.2.9")));
+    serve();
+    for (const std::string format : {"table", "json"}) {
+        expectSame({"--format", format, "show"});
+        expectSame({"--format", format, "show", "--sort", "state"});
+        expectSame({"--format", format, "show", "--count"});
+    }
+    expectSame({"show", "--sort", "size"});
+    EXPECT_THAT(ask({"show", "--no-header"}).out, HasSubstr("asking  udhcpc"))
+        << ask({"show"}).out;
+}
+
+TEST_F(Remote, WhatIsNotAsItLooksThereIsTold) {
+    serve();
+    setTree(test::computer("Computer", test::dhcpInterface("eth0", "nowhere")));
+    EXPECT_THAT(ask({"show"}).err, HasSubstr("\"nowhere\" is not an IP address"));
+}
+
 TEST_F(Remote, TheMachineIsShownAsFarAsItsClassesTell) {
     writeConfiguration("eth0", "CONFIG_NAME=office\n");
     setTree(test::computer("Computer", test::dhcpInterface("eth0", "192.0.2.1") + "," +
                                            test::dhcpInterface("eth10", "192.0.2.2") + "," +
                                            test::dhcpInterface("eth9", "2001:db8::1")) +
             "," + test::computer("BMC", test::dhcpInterface("eth0", "192.0.2.9")));
-    serve();
+    serveExactly();
     EXPECT_EQ(ask({"show", "--sort", "interface"}),
               (Ended{0,
                      "SYSTEM    INTERFACE  DHCP  STATE  CLIENT  ADDRESS  EXPIRES  SERVERS      "
@@ -156,13 +189,11 @@ TEST_F(Remote, TheMachineIsShownAsFarAsItsClassesTell) {
     EXPECT_EQ(linesOf(ask({"show", "--sort", "system", "--no-header"}).out).front(),
               "BMC       eth0   on  bound  ?  -  ?  192.0.2.9    office");
     EXPECT_THAT(ask({"--color", "always", "show"}).out, StartsWith("\x1B[1mSYSTEM"));
-    expectSame({"show", "--count"});
-    expectSame({"--format", "json", "show", "--count"});
-    expectSame({"show", "--sort", "size"});
+    EXPECT_EQ(ask({"show", "--count"}), (Ended{0, "4\n", ""}));
 }
 
 TEST_F(Remote, WhatNoClassTellsIsNullInJson) {
-    serve();
+    serveExactly();
     EXPECT_EQ(ask({"--format", "json", "show"}), (Ended{0, R"({
   "interfaces": [
     {
@@ -216,7 +247,7 @@ TEST_F(Remote, TheStateOfAClientWithoutALeaseIsNotKnown) {
                        "InterfaceState": 1}, "children": [
         {"type": "DHCPLease", "description": "DHCP lease",
          "properties": {"Family": "IPv4", "ClientState": 0, "Client": "udhcpc"}}]})"));
-    serve();
+    serveExactly();
     EXPECT_EQ(
         ask({"show"}),
         (Ended{0,
@@ -226,7 +257,7 @@ TEST_F(Remote, TheStateOfAClientWithoutALeaseIsNotKnown) {
 }
 
 TEST_F(Remote, OfAnInterfaceWithoutDhcpTheStateIsOff) {
-    serve();
+    serveExactly();
     EXPECT_EQ(ask({"show"}),
               (Ended{0,
                      "INTERFACE  DHCP  STATE  CLIENT  ADDRESS       EXPIRES  SERVERS             "

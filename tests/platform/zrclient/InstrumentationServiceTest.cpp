@@ -162,6 +162,15 @@ TEST(InstrumentationService, SettlesForWhatThereIsInTheEnd) {
     EXPECT_EQ(service.latest()->node(0).description, "asked");
 }
 
+TEST(InstrumentationService, TheFirstRequestWaitsAsLongAsItIsTold) {
+    InstrumentationService service(std::make_unique<AwaitingSource>(3), std::chrono::hours(1));
+    EXPECT_EQ(service.current()->node(0).description, "told");
+    service.useSource(std::make_unique<AwaitingSource>(1'000'000));
+    EXPECT_EQ(service.current()->node(0).description, "told") << "no later one waits";
+    InstrumentationService hurried(std::make_unique<AwaitingSource>(3));
+    EXPECT_EQ(hurried.current()->node(0).description, "asked");
+}
+
 class SlowSource : public SnapshotSource {
   public:
     struct State {

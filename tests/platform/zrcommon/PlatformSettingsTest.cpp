@@ -55,6 +55,7 @@ TEST_F(PlatformSettingsTest, EveryKeyOfTheFileIsTaken) {
     expected.traceLevel = 0;
     expected.logSink = "stderr";
     expected.traceSink = "file:/srv/trace log";
+    expected.serviceProcessorWait = std::chrono::milliseconds(1500);
     EXPECT_EQ(readContent("# The platform\n"
                           "DATA_DIR = /srv/net/\n"
                           "INSTRUMENTATION_TREE=\"/srv/tree.json\"\n"
@@ -62,7 +63,8 @@ TEST_F(PlatformSettingsTest, EveryKeyOfTheFileIsTaken) {
                           "LOG_LEVEL=3000\n"
                           "TRACE_LEVEL=0\n"
                           "LOG_SINK=stderr\n"
-                          "TRACE_SINK='file:/srv/trace log'\n"),
+                          "TRACE_SINK='file:/srv/trace log'\n"
+                          "SERVICE_PROCESSOR_WAIT=1500\n"),
               expected);
 }
 
@@ -72,14 +74,19 @@ TEST_F(PlatformSettingsTest, EmptyFileGivesTheDefaults) {
     EXPECT_EQ(settings.traceLevel, 6000);
     EXPECT_EQ(settings.logSink, "syslog");
     EXPECT_EQ(settings.traceSink, "none");
+    EXPECT_EQ(settings.serviceProcessorWait, std::chrono::milliseconds(0));
     EXPECT_EQ(settings.instrumentationTree, "");
     EXPECT_EQ(settings.diagnostics, Diagnostics{});
 }
 
 TEST_F(PlatformSettingsTest, EveryKeyIsOverriddenByItsVariable) {
-    variables_ = {{"ZR_DATA_DIR", "/env"},      {"ZR_INSTRUMENTATION_TREE", "/env.json"},
-                  {"ZR_LOG_LEVEL", "1"},        {"ZR_TRACE_LEVEL", "2"},
-                  {"ZR_LOG_SINK", "file:/env"}, {"ZR_TRACE_SINK", "syslog"}};
+    variables_ = {{"ZR_DATA_DIR", "/env"},
+                  {"ZR_INSTRUMENTATION_TREE", "/env.json"},
+                  {"ZR_LOG_LEVEL", "1"},
+                  {"ZR_TRACE_LEVEL", "2"},
+                  {"ZR_LOG_SINK", "file:/env"},
+                  {"ZR_TRACE_SINK", "syslog"},
+                  {"ZR_SERVICE_PROCESSOR_WAIT", "60000"}};
     PlatformSettings expected;
     expected.dataDir = "/env/";
     expected.instrumentationTree = "/env.json";
@@ -87,6 +94,7 @@ TEST_F(PlatformSettingsTest, EveryKeyIsOverriddenByItsVariable) {
     expected.traceLevel = 2;
     expected.logSink = "file:/env";
     expected.traceSink = "syslog";
+    expected.serviceProcessorWait = std::chrono::seconds(60);
     EXPECT_EQ(readContent("DATA_DIR=/file\nINSTRUMENTATION_TREE=/file.json\nLOG_LEVEL=10\n"
                           "TRACE_LEVEL=20\nLOG_SINK=none\nTRACE_SINK=stderr\n"),
               expected);

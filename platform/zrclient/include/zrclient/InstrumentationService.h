@@ -31,13 +31,15 @@ class InstrumentationService {
     /// it, and without a tree in the settings, snapshots are empty.
     static void setMachine(OpenMachine open) noexcept;
 
-    explicit InstrumentationService(std::unique_ptr<SnapshotSource> source = nullptr);
+    /// The first current() waits until the source awaits no response any more, at most
+    /// `firstWait`; for that of the process, the platform settings tell how long.
+    explicit InstrumentationService(std::unique_ptr<SnapshotSource> source = nullptr,
+                                    std::chrono::milliseconds firstWait = {});
 
     /// The newest state: polls the source, and reads it when it changed.
     [[nodiscard]] std::shared_ptr<const Snapshot> current();
 
-    /// Waits until the source awaits no response any more, at most that long. No request
-    /// needs this; it is for a program that ends after one.
+    /// Waits until the source awaits no response any more, at most that long.
     void settle(std::chrono::milliseconds limit);
 
     /// Whether the source awaits a response, for which it may ask now. Reads nothing.
@@ -104,6 +106,8 @@ class InstrumentationService {
     std::mutex waitersMutex_;
     std::vector<Waiter*> waiters_;
     std::atomic<std::uint64_t> readings_{0};
+    // Taken by the first current(), so that none waits later on.
+    std::atomic<std::chrono::milliseconds> firstWait_;
 };
 
 }  // namespace ZR

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <chrono>
 #include <functional>
 #include <string>
 #include <vector>
@@ -24,6 +25,9 @@ struct PlatformSettings {
     int traceLevel = defaultLevel;         ///< TRACE_LEVEL
     std::string logSink = "syslog";        ///< LOG_SINK: none, stderr, syslog, file:PATH
     std::string traceSink = "none";        ///< TRACE_SINK
+    /// SERVICE_PROCESSOR_WAIT: how long the first reading of a process may wait for what a
+    /// service processor responds.
+    std::chrono::milliseconds serviceProcessorWait{0};
 
     /// What could not be used, one text each with its file and line or its
     /// variable; the setting then has its default.
