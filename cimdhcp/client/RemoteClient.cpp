@@ -28,6 +28,8 @@ namespace http = cimom::wbem::http;
 constexpr std::size_t deepestXml = 64;
 /// The schema of the standard's own classes, none of which an implementation serves.
 constexpr std::string_view standardSchema = "CIM_";
+/// How the names of an object manager's own classes begin, like that of __Namespace.
+constexpr std::string_view systemClass = "__";
 
 [[noreturn]] void fail(const std::string& message) {
     throw Failure(ExitStatus::notLoaded, message);
@@ -128,7 +130,8 @@ std::vector<ClassEntry> leavesOf(const std::vector<ClassEntry>& classes) {
     }
     std::vector<ClassEntry> leaves;
     for (const ClassEntry& entry : classes) {
-        if (parents.contains(entry.name) || entry.name.starts_with(standardSchema)) {
+        if (parents.contains(entry.name) || entry.name.starts_with(standardSchema) ||
+            entry.name.starts_with(systemClass)) {
             continue;
         }
         leaves.push_back(entry);

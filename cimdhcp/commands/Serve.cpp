@@ -6,13 +6,18 @@
 #include <chrono>
 #include <condition_variable>
 #include <csignal>
+#include <cstdint>
 #include <cstdlib>
 #include <cstring>
 #include <mutex>
 #include <optional>
+#include <string>
 #include <system_error>
 #include <thread>
+#include <utility>
+#include <vector>
 
+#include "cimom/Interop.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
 #include "tklogger/TKLogger.h"
@@ -51,6 +56,26 @@ cimom::wbem::ServerSettings settingsOf(const ServeCommand& command) {
         settings.users = cimom::wbem::readUsers(*command.users);
     }
     return settings;
+}
+
+/// What the interop namespace tells of the server.
+cimom::CommunicationMechanism communicationMechanism(const cimom::wbem::ServerSettings& settings) {
+    // Numbers of the value maps of CIM_ObjectManagerCommunicationMechanism.
+    constexpr std::uint16_t cimXml = 2;
+    constexpr std::uint16_t noAuthentication = 2;
+    constexpr std::uint16_t basicAuthentication = 3;
+    // Basic read, association traversal, query execution; of these, pulled.
+    std::vector<std::uint16_t> operations{2, 6, 7, 10, 11, 12};
+    if (!settings.readOnly) {
+        // Basic write and instance manipulation.
+        operations.insert(operations.end(), {3, 5});
+    }
+    return {"CIM-XML",
+            std::string("CIM-XML over ") + (settings.tls ? "HTTPS" : "HTTP"),
+            cimXml,
+            "1.0",
+            std::move(operations),
+            {settings.users ? basicAuthentication : noAuthentication}};
 }
 
 /// Notices and failures are kept by default; lines about each request,
@@ -150,7 +175,10 @@ void serve(const ServeCommand& command, cimom::ObjectManager& manager, std::ostr
         // Shorter than service managers wait before they kill.
         constexpr std::chrono::seconds patience(5);
         std::optional<EndInTime> end;
-        cimom::wbem::Server server(manager, settingsOf(command), log);
+        const cimom::wbem::ServerSettings settings = settingsOf(command);
+        cimom::serveInterop(manager,
+                            {"cimdhcp", CIMDHCP_VERSION, {communicationMechanism(settings)}});
+        cimom::wbem::Server server(manager, settings, log);
         log(cimom::wbem::LogKind::notice, "listening on " + server.url());
         out << "Listening on " << server.url() << std::endl;
         int signal = 0;

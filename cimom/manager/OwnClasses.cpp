@@ -46,6 +46,22 @@ void OwnClass::remove(const ObjectPath& /*path*/, const std::string& /*principal
                          "instances of " + className_ + " cannot be deleted");
 }
 
+namespace {
+
+/// An enumerated instance is equal to the one that a client gets by its path, which has all
+/// properties of the class.
+void addMissing(Instance& instance, const ClassDeclaration& declaration) {
+    instance.path.className = declaration.name;
+    for (const PropertyDeclaration& property : declaration.properties) {
+        if (instance.property(property.name) == nullptr) {
+            instance.properties.push_back(
+                {property.name, Value::null(property.type, property.isArray)});
+        }
+    }
+}
+
+}  // namespace
+
 CallOutcome ObjectManager::Implementation::readOwn(const ServedClass& target, Reading reading,
                                                    const ObjectPath& path,
                                                    const AnyReceiver& receiver) {
@@ -61,6 +77,9 @@ CallOutcome ObjectManager::Implementation::readOwn(const ServedClass& target, Re
     });
     if (!status.ok()) {
         return {std::move(status)};
+    }
+    for (Instance& instance : instances) {
+        addMissing(instance, *target.declaration);
     }
     // What the receiver throws is not a failure of the class.
     std::visit(
@@ -84,6 +103,7 @@ CallOutcome ObjectManager::Implementation::ownAssociations(
     Status status =
         guardedOwn(*target.own, [&] { associations = target.own->instances(source.nameSpace); });
     std::erase_if(associations, [&](Instance& association) {
+        addMissing(association, *target.declaration);
         complete(association, surroundings(source));
         return !playsRole(association, source, role, repository_);
     });

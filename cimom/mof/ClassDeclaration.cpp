@@ -8,6 +8,12 @@
 
 namespace cimom {
 
+bool QualifierType::mayStandAt(std::string_view scope) const noexcept {
+    return std::ranges::any_of(scopes, [scope](std::string_view each) {
+        return sameName(each, scope) || sameName(each, "any");
+    });
+}
+
 const Qualifier* findQualifier(const std::vector<Qualifier>& qualifiers,
                                std::string_view name) noexcept {
     const auto found =

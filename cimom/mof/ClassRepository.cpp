@@ -84,6 +84,7 @@ class ClassRepository::Implementation {
     }
 
     [[nodiscard]] const std::deque<Node>& nodes() const noexcept { return nodes_; }
+    [[nodiscard]] const QualifierTypes& qualifierTypes() const noexcept { return qualifierTypes_; }
 
     void keepDeclared() noexcept {
         for (Node& node : nodes_) {
@@ -252,6 +253,14 @@ std::vector<const ClassDeclaration*> ClassRepository::withSubclasses(
         open.insert(open.end(), node->subclasses.rbegin(), node->subclasses.rend());
     }
     return result;
+}
+
+std::optional<QualifierType> ClassRepository::findQualifierType(std::string_view name) const {
+    return implementation_->qualifierTypes().find(name);
+}
+
+std::vector<QualifierType> ClassRepository::qualifierTypes() const {
+    return implementation_->qualifierTypes().all();
 }
 
 std::vector<const ClassDeclaration*> ClassRepository::classes() const {

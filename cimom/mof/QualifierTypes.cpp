@@ -1,6 +1,7 @@
 #include "mof/QualifierTypes.h"
 
 #include <algorithm>
+#include <iterator>
 #include <utility>
 
 #include "cimom/MofError.h"
@@ -9,6 +10,31 @@
 namespace cimom {
 
 namespace {
+
+std::string_view scopeName(MofScope scope) {
+    switch (scope) {
+        case MofScope::schema:
+            return "schema";
+        case MofScope::classes:
+            return "class";
+        case MofScope::association:
+            return "association";
+        case MofScope::indication:
+            return "indication";
+        case MofScope::qualifier:
+            return "qualifier";
+        case MofScope::property:
+            return "property";
+        case MofScope::reference:
+            return "reference";
+        case MofScope::method:
+            return "method";
+        case MofScope::parameter:
+            return "parameter";
+        default:
+            return "any";
+    }
+}
 
 std::string_view shown(MofScope scope) {
     switch (scope) {
@@ -64,6 +90,29 @@ void QualifierTypes::keepDeclared() noexcept {
     for (auto& [name, entry] : entries_) {
         entry.stands = true;
     }
+}
+
+QualifierType QualifierTypes::typeOf(const Entry& entry) {
+    QualifierType type{entry.prototype, {}};
+    std::ranges::transform(entry.scopes, std::back_inserter(type.scopes), scopeName);
+    return type;
+}
+
+std::optional<QualifierType> QualifierTypes::find(std::string_view name) const {
+    const auto found = entries_.find(name);
+    return found == entries_.end() ? std::nullopt : std::optional(typeOf(found->second));
+}
+
+std::vector<QualifierType> QualifierTypes::all() const {
+    std::vector<QualifierType> types;
+    types.reserve(entries_.size());
+    for (const auto& [name, entry] : entries_) {
+        types.push_back(typeOf(entry));
+    }
+    std::ranges::sort(types, {}, [](const QualifierType& type) -> const std::string& {
+        return type.prototype.name;
+    });
+    return types;
 }
 
 std::vector<Qualifier> QualifierTypes::resolve(const std::vector<MofQualifier>& written,

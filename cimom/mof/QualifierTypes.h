@@ -1,5 +1,6 @@
 #pragma once
 
+#include <optional>
 #include <string>
 #include <string_view>
 #include <unordered_map>
@@ -22,6 +23,11 @@ class QualifierTypes {
     /// Types that are declared now stand: further declarations of them are passed over.
     void keepDeclared() noexcept;
 
+    /// Absent when none of the name is declared.
+    [[nodiscard]] std::optional<QualifierType> find(std::string_view name) const;
+    /// In the order of their names.
+    [[nodiscard]] std::vector<QualifierType> all() const;
+
     /// The qualifiers written at an element of this scope, with the flavors that
     /// hold for them. Throws MofError for one that is unknown, stands in the wrong
     /// place or twice, or has a value of another type.
@@ -35,6 +41,7 @@ class QualifierTypes {
         bool stands = false;
     };
 
+    [[nodiscard]] static QualifierType typeOf(const Entry& entry);
     [[nodiscard]] static bool isSame(const Entry& a, const Entry& b);
     [[nodiscard]] Qualifier resolveOne(const MofQualifier& written, MofScope scope,
                                        const std::string& file) const;

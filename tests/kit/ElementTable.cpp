@@ -35,6 +35,7 @@ const std::map<std::string, Rule>& table() {
                                          " PROPAGATED=true/false OVERRIDABLE=true/false "
                                          "TOSUBCLASS=true/false TOINSTANCE=true/false "
                                          "TRANSLATABLE=true/false";
+    static const std::string declaration = qualifier + " ISARRAY=true/false ARRAYSIZE";
     static const std::map<std::string, Rule> all{
         {"CIM", {"CIMVERSION! DTDVERSION!", "MESSAGE"}},
         {"MESSAGE", {"ID! PROTOCOLVERSION!", "(SIMPLEREQ/SIMPLERSP)"}},
@@ -49,7 +50,7 @@ const std::map<std::string, Rule>& table() {
           "INSTANCE/VALUE.NAMEDINSTANCE)?"}},
         {"PARAMVALUE",
          {"NAME! PARAMTYPE EmbeddedObject=instance/object",
-          "(VALUE/VALUE.REFERENCE/VALUE.ARRAY/VALUE.REFARRAY)?"}},
+          "(VALUE/VALUE.REFERENCE/VALUE.ARRAY/VALUE.REFARRAY/CLASS)?"}},
         {"IRETURNVALUE",
          {"",
           "CLASSNAME* | INSTANCENAME* | VALUE* | VALUE.OBJECTWITHPATH* | "
@@ -81,6 +82,12 @@ const std::map<std::string, Rule>& table() {
         {"CLASS", {"NAME! SUPERCLASS", ofProperties.c_str()}},
         {"INSTANCE", {"CLASSNAME!", ofProperties.c_str()}},
         {"QUALIFIER", {qualifier.c_str(), "(VALUE/VALUE.ARRAY)?"}},
+        {"QUALIFIER.DECLARATION",
+         {declaration.c_str(), "SCOPE VALUE? | SCOPE VALUE.ARRAY | VALUE? | VALUE.ARRAY"}},
+        {"SCOPE",
+         {"CLASS=true/false ASSOCIATION=true/false REFERENCE=true/false PROPERTY=true/false "
+          "METHOD=true/false PARAMETER=true/false INDICATION=true/false",
+          ""}},
         {"PROPERTY", {typed.c_str(), "QUALIFIER* VALUE?"}},
         {"PROPERTY.ARRAY", {typedArray.c_str(), "QUALIFIER* VALUE.ARRAY?"}},
         {"PROPERTY.REFERENCE",

@@ -303,9 +303,22 @@ void awaitWaiting(unsigned count) {
 TestServer::TestServer(wbem::ServerSettings settings, const std::string& registrations)
     : TestServer(std::move(settings), configuration(registrations)) {}
 
-TestServer::TestServer(wbem::ServerSettings settings, Configuration configuration)
+namespace {
+
+ObjectManager& prepared(ObjectManager& manager,
+                        const std::function<void(ObjectManager&)>& prepare) {
+    if (prepare) {
+        prepare(manager);
+    }
+    return manager;
+}
+
+}  // namespace
+
+TestServer::TestServer(wbem::ServerSettings settings, Configuration configuration,
+                       const std::function<void(ObjectManager&)>& prepare)
     : manager_(std::move(configuration)),
-      server_(manager_, onFreePort(std::move(settings)),
+      server_(prepared(manager_, prepare), onFreePort(std::move(settings)),
               [this](wbem::LogKind kind, const std::string& line) {
                   const std::lock_guard lock(mutex_);
                   log_.emplace_back(kind, line);

@@ -5,6 +5,7 @@
 
 #include <chrono>
 #include <cstdint>
+#include <functional>
 #include <mutex>
 #include <optional>
 #include <string>
@@ -104,7 +105,9 @@ class TestServer {
   public:
     explicit TestServer(wbem::ServerSettings settings = {},
                         const std::string& registrations = "test.reg");
-    TestServer(wbem::ServerSettings settings, Configuration configuration);
+    /// `prepare` gets the manager before the server listens; empty: nothing is prepared.
+    TestServer(wbem::ServerSettings settings, Configuration configuration,
+               const std::function<void(ObjectManager&)>& prepare = nullptr);
 
     [[nodiscard]] std::uint16_t port() const { return server_.port(); }
     /// Sends a request over a connection of its own. Fails the test when there is no response.

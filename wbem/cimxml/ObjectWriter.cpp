@@ -1,6 +1,7 @@
 #include "cimxml/ObjectWriter.h"
 
 #include <algorithm>
+#include <array>
 #include <memory>
 
 #include "cimom/ClassDeclaration.h"
@@ -151,14 +152,19 @@ void writeFlag(std::string& out, const char* name, bool value, bool standard) {
     }
 }
 
+/// The attributes that a qualifier has wherever it stands.
+void writeFlavors(std::string& out, const Qualifier& qualifier) {
+    writeFlag(out, "OVERRIDABLE", qualifier.overridable, true);
+    writeFlag(out, "TOSUBCLASS", qualifier.toSubclass, true);
+    writeFlag(out, "TRANSLATABLE", qualifier.translatable, false);
+}
+
 void writeQualifiers(std::string& out, const std::vector<Qualifier>& qualifiers) {
     for (const Qualifier& qualifier : qualifiers) {
         out += "<QUALIFIER";
         appendAttribute(out, "NAME", qualifier.name);
         appendAttribute(out, "TYPE", declaredType(qualifier.value.type));
-        writeFlag(out, "OVERRIDABLE", qualifier.overridable, true);
-        writeFlag(out, "TOSUBCLASS", qualifier.toSubclass, true);
-        writeFlag(out, "TRANSLATABLE", qualifier.translatable, false);
+        writeFlavors(out, qualifier);
         out += '>';
         writeValue(out, qualifier.value);
         out += "</QUALIFIER>";
@@ -288,6 +294,26 @@ void writeInstance(std::string& out, const Instance& instance, const ClassDeclar
         writeProperty(out, property, attributes);
     }
     out += "</INSTANCE>";
+}
+
+void writeQualifierType(std::string& out, const QualifierType& type) {
+    static constexpr std::array<std::string_view, 7> scopes{
+        "CLASS", "ASSOCIATION", "REFERENCE", "PROPERTY", "METHOD", "PARAMETER", "INDICATION"};
+    const Qualifier& prototype = type.prototype;
+    out += "<QUALIFIER.DECLARATION";
+    appendAttribute(out, "NAME", prototype.name);
+    appendAttribute(out, "TYPE", declaredType(prototype.value.type));
+    appendAttribute(out, "ISARRAY", prototype.value.isArray ? "true" : "false");
+    writeFlavors(out, prototype);
+    out += "><SCOPE";
+    for (const std::string_view scope : scopes) {
+        if (type.mayStandAt(scope)) {
+            appendAttribute(out, scope, "true");
+        }
+    }
+    out += "/>";
+    writeValue(out, prototype.value);
+    out += "</QUALIFIER.DECLARATION>";
 }
 
 void writeClass(std::string& out, const ClassDeclaration& declaration, const ClassForm& form) {

@@ -77,6 +77,13 @@ OperationRequest& OperationRequest::instanceName(const char* name, const ObjectP
     return *this;
 }
 
+OperationRequest& OperationRequest::instance(const char* name, const Instance& value) {
+    std::string element;
+    writeInstance(element, value, nullptr);
+    parameter(name, element);
+    return *this;
+}
+
 OperationRequest& OperationRequest::namedInstance(const char* name, const Instance& instance) {
     std::string element = "<VALUE.NAMEDINSTANCE>";
     writeInstanceName(element, instance.path);

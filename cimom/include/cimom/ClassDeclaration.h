@@ -23,6 +23,16 @@ struct Qualifier {
     bool operator==(const Qualifier&) const = default;
 };
 
+/// What a qualifier of that name means, wherever it stands.
+struct QualifierType {
+    Qualifier prototype;  ///< its value is the default
+    /// Where it may stand, as MOF has it: "class", "association", "indication", "property",
+    /// "reference", "method", "parameter", "any" and so on.
+    std::vector<std::string_view> scopes;
+
+    [[nodiscard]] bool mayStandAt(std::string_view scope) const noexcept;
+};
+
 /// Null when there is none of this name.
 [[nodiscard]] const Qualifier* findQualifier(const std::vector<Qualifier>& qualifiers,
                                              std::string_view name) noexcept;

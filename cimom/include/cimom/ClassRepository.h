@@ -2,6 +2,7 @@
 
 #include <filesystem>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -52,6 +53,11 @@ class ClassRepository {
     /// the order of loading. Empty for an unknown class.
     [[nodiscard]] std::vector<const ClassDeclaration*> withSubclasses(
         std::string_view className) const;
+
+    /// Absent when there is no such type.
+    [[nodiscard]] std::optional<QualifierType> findQualifierType(std::string_view name) const;
+    /// All types in the order of their names.
+    [[nodiscard]] std::vector<QualifierType> qualifierTypes() const;
 
     /// All classes in the order of loading.
     [[nodiscard]] std::vector<const ClassDeclaration*> classes() const;

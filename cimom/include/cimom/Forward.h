@@ -12,6 +12,7 @@ struct Status;
 
 struct PropertyDeclaration;
 struct ClassDeclaration;
+struct QualifierType;
 class ClassRepository;
 
 struct AssociationRequest;

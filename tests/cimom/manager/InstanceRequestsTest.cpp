@@ -1,5 +1,6 @@
 #include "kit/TestManager.h"
 
+#include "cimom/Query.h"
 #include "cimom/Results.h"
 
 namespace cimom::test {
@@ -197,6 +198,83 @@ TEST_F(InstanceRequests, ModifyWithAnImpossibleValueIsRefused) {
                            {{"Size", {Type::uint8, false, Scalar(std::uint64_t{256})}}}};
     EXPECT_EQ(manager.modifyInstance(changed).status,
               (Status{CMPI_RC_ERR_INVALID_PARAMETER, "Size: 256 is not of type uint8"}));
+}
+
+Instance newLeft(const std::string& id) {
+    return {{"", "/ROOT/test/", "test_left", {{"Id", Value::ofString("not looked at")}}},
+            {{"Id", Value::ofString(id)}, {"Note", Value::ofString("new")}}};
+}
+
+TEST_F(InstanceRequests, CreationGoesToTheProviderOfTheClass) {
+    const std::string call = "createInstance Test_Left.Id:" + std::to_string(CMPI_string);
+    const PathsResult made = manager.createInstance(newLeft("l3"));
+    EXPECT_EQ(made.status, Status{});
+    EXPECT_THAT(names(made.paths), ElementsAre("Test_Left.Id=\"l3\""));
+    EXPECT_EQ(made.paths.front()->nameSpace, "root/test");
+    EXPECT_EQ(made.paths.front()->host, "testhost");
+    EXPECT_EQ(takeLog(), call + " new\n");
+
+    EXPECT_THAT(names(manager.createInstance(newLeft("silent")).paths),
+                ElementsAre("Test_Left.Id=\"silent\""));
+    const PathsResult refused = manager.createInstance(newLeft("twice"));
+    EXPECT_EQ(refused.status.code, CMPI_RC_ERR_ALREADY_EXISTS);
+    EXPECT_TRUE(refused.paths.empty());
+}
+
+TEST_F(InstanceRequests, CreationNeedsWhoServesTheClassItself) {
+    const auto status = [this](const std::string& className) {
+        return manager.createInstance({{"", "root/test", className, {}}, {}}).status.code;
+    };
+    EXPECT_EQ(status("Test_Base"), CMPI_RC_ERR_NOT_SUPPORTED);
+    EXPECT_EQ(status("Test_Unserved"), CMPI_RC_ERR_NOT_SUPPORTED);
+    EXPECT_EQ(status("Test_Asks"), CMPI_RC_ERR_NOT_SUPPORTED);
+    EXPECT_EQ(status("Nobody_Knows"), CMPI_RC_ERR_INVALID_CLASS);
+    EXPECT_EQ(manager.createInstance({{"", "root/no", "Nobody_Knows", {}}, {}}).status.code,
+              CMPI_RC_ERR_INVALID_NAMESPACE);
+    Instance bad = newLeft("l\x01");
+    EXPECT_EQ(manager.createInstance(bad).status.code, CMPI_RC_ERR_INVALID_PARAMETER);
+    EXPECT_EQ(takeLog().find("createInstance"), std::string::npos);
+}
+
+TEST_F(InstanceRequests, DeletionGoesToTheClassThatHasTheInstance) {
+    const std::string id = ".Id:" + std::to_string(CMPI_string);
+    EXPECT_EQ(manager.deleteInstance(path("TEST_left.Id=\"l1\"")), Status{});
+    EXPECT_EQ(takeLog(), "deleteInstance Test_Left" + id + "\n");
+    EXPECT_EQ(manager.deleteInstance(path("Test_Base.Id=\"s1\"")), Status{});
+    EXPECT_THAT(takeLog(), testing::EndsWith("deleteInstance Test_RightSpecial" + id + "\n"));
+    EXPECT_EQ(manager.deleteInstance(path("Test_Left.Id=\"none\"")).code, CMPI_RC_ERR_NOT_FOUND);
+    EXPECT_EQ(manager.deleteInstance(path("Test_Base.Id=\"none\"")).code, CMPI_RC_ERR_NOT_FOUND);
+    EXPECT_EQ(manager.deleteInstance(path("Test_Asks.Id=\"1\"")).code, CMPI_RC_ERR_NOT_SUPPORTED);
+}
+
+TEST_F(InstanceRequests, QueriesSelectAmongTheInstancesOfTheClassAndItsSubclasses) {
+    const auto selected = [this](const std::string& text) {
+        CollectedObjects<Instance> found;
+        const RequestEnd end = manager.execQuery("Root/Test", Query::parse("WQL", text), {}, found);
+        EXPECT_EQ(end.status, Status{});
+        return std::move(found.objects);
+    };
+    EXPECT_THAT(
+        names(selected("SELECT * FROM Test_Base WHERE Id LIKE '%1'")),
+        ElementsAre("Test_Left.Id=\"l1\"", "Test_Right.Id=\"r1\"", "Test_RightSpecial.Id=\"s1\""));
+    EXPECT_THAT(names(selected("SELECT * FROM Test_Base WHERE Test_Base ISA Test_Right")),
+                ElementsAre("Test_Right.Id=\"r1\"", "Test_RightSpecial.Id=\"s1\""));
+    const auto narrow = selected("SELECT Note FROM Test_Left WHERE Id = 'l1'");
+    ASSERT_EQ(narrow.size(), 1U);
+    ASSERT_EQ(narrow.front()->properties.size(), 1U);
+    EXPECT_EQ(narrow.front()->properties.front().name, "Note");
+}
+
+TEST_F(InstanceRequests, QueriesOfWhatThereIsNotAreRefused) {
+    const auto status = [this](const std::string& nameSpace, const std::string& text) {
+        CollectedObjects<Instance> found;
+        const RequestEnd end = manager.execQuery(nameSpace, Query::parse("WQL", text), {}, found);
+        EXPECT_TRUE(found.objects.empty());
+        return end.status.code;
+    };
+    EXPECT_EQ(status("root/no", "SELECT * FROM Nobody_Knows"), CMPI_RC_ERR_INVALID_NAMESPACE);
+    EXPECT_EQ(status("root/test", "SELECT * FROM Nobody_Knows"), CMPI_RC_ERR_INVALID_CLASS);
+    EXPECT_EQ(status("root/test", "SELECT Colour FROM Test_Left"), CMPI_RC_ERR_INVALID_QUERY);
 }
 
 }  // namespace

@@ -30,6 +30,25 @@ TEST_F(RequestPath, SpellingBecomesThatOfRegistrationAndSchema) {
     EXPECT_EQ(path.keys.front().name, "id");
 }
 
+TEST_F(RequestPath, InteropStandsForRootInteropUnlessItIsANamespaceItself) {
+    const std::vector<std::string> known{"root/test", "root/interop"};
+    EXPECT_EQ(knownNameSpace("Interop", known), &known[1]);
+    EXPECT_EQ(knownNameSpace("/INTEROP/", known), &known[1]);
+    EXPECT_EQ(knownNameSpace("root/Interop", known), &known[1]);
+    EXPECT_EQ(knownNameSpace("interop/root", known), nullptr);
+    EXPECT_EQ(knownNameSpace("interop", {"root/test"}), nullptr);
+    const std::vector<std::string> both{"root/interop", "interop"};
+    EXPECT_EQ(knownNameSpace("interop", both), &both[1]);
+}
+
+TEST_F(RequestPath, ReferencesGetTheCanonicalSpellingOfTheirNamespaces) {
+    ObjectPath path = parseObjectPath(
+        R"(root/test:Test_LinkA.Near="ROOT/test:Test_Left.Id=\"l1\"",Far="root/no:Test_Right.Id=\"r\"")");
+    ASSERT_TRUE(check(path).ok());
+    EXPECT_EQ(test::referenceOf(path.key("Near")).nameSpace, "root/test");
+    EXPECT_EQ(test::referenceOf(path.key("Far")).nameSpace, "root/no");
+}
+
 TEST_F(RequestPath, KeysGetTheirDeclaredTypes) {
     ObjectPath path = parseObjectPath("root/test:Test_Numbered.Number=300");
     ASSERT_TRUE(check(path).ok());

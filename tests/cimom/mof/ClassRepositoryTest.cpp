@@ -7,6 +7,7 @@
 #include <random>
 
 #include "cimom/ClassDeclaration.h"
+#include "cimom/Instance.h"
 #include "cimom/MofError.h"
 
 namespace cimom {
@@ -249,6 +250,27 @@ TEST_F(ClassRepositoryTest, NoTextDoesHarm) {
         }
     }
     EXPECT_GT(refused, 1000U);
+}
+
+TEST(QualifierTypesOfTheRepository, AreFoundInAnyCaseAndListedByName) {
+    ClassRepository repository;
+    repository.loadText(qualifierTypes, "q");
+    repository.loadText("Qualifier Anywhere : uint8[] = {1}, Scope(any);", "q");
+    const auto key = repository.findQualifierType("KEY");
+    ASSERT_TRUE(key);
+    EXPECT_EQ(key->prototype.name, "Key");
+    EXPECT_EQ(key->prototype.value, (Value{Type::boolean, false, Scalar(false)}));
+    EXPECT_FALSE(key->prototype.overridable);
+    EXPECT_EQ(key->scopes, (std::vector<std::string_view>{"property", "reference"}));
+    EXPECT_TRUE(key->mayStandAt("REFERENCE"));
+    EXPECT_FALSE(key->mayStandAt("method"));
+    EXPECT_TRUE(repository.findQualifierType("Anywhere")->mayStandAt("method"));
+    EXPECT_FALSE(repository.findQualifierType("Nowhere"));
+    std::string names;
+    for (const QualifierType& type : repository.qualifierTypes()) {
+        names += type.prototype.name + ' ';
+    }
+    EXPECT_EQ(names, "Anywhere Association Key Override ");
 }
 
 }  // namespace

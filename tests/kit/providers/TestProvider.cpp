@@ -275,6 +275,36 @@ CMPIStatus modifyInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*
     return result->ft->returnDone(result);
 }
 
+/// Hands the path over, but for the instance "silent"; refuses "twice".
+CMPIStatus createInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
+                          const CMPIObjectPath* op, const CMPIInstance* instance) {
+    CMPIStatus rc{};
+    const CMPIData noted = instance->ft->getProperty(instance, "Note", &rc);
+    log("createInstance " + std::string(classOf(op)) + keysOf(op) +
+        (rc.rc == CMPI_RC_OK && noted.type == CMPI_string
+             ? " " + std::string(text(noted.value.string))
+             : ""));
+    const CMPIData id = op->ft->getKey(op, "Id", &rc);
+    const std::string name(rc.rc == CMPI_RC_OK ? text(id.value.string) : "");
+    if (name == "twice") {
+        return {CMPI_RC_ERR_ALREADY_EXISTS, nullptr};
+    }
+    if (name != "silent") {
+        result->ft->returnObjectPath(result, op);
+    }
+    return result->ft->returnDone(result);
+}
+
+CMPIStatus deleteInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
+                          const CMPIObjectPath* op) {
+    log("deleteInstance " + std::string(classOf(op)) + keysOf(op));
+    const CMPIData id = op->ft->getKey(op, "Id", nullptr);
+    if (std::string(text(id.value.string)) == "none") {
+        return {CMPI_RC_ERR_NOT_FOUND, nullptr};
+    }
+    return result->ft->returnDone(result);
+}
+
 const CMPIInstanceMIFT instanceTable{CMPIVersion200,
                                      1,
                                      "instanceTest",
@@ -282,9 +312,9 @@ const CMPIInstanceMIFT instanceTable{CMPIVersion200,
                                      enumerateInstanceNames,
                                      enumerateInstances,
                                      getInstance,
-                                     nullptr,
+                                     createInstance,
                                      modifyInstance,
-                                     nullptr,
+                                     deleteInstance,
                                      nullptr};
 CMPIInstanceMI instanceRecord{nullptr, &instanceTable};
 

@@ -59,6 +59,19 @@ TEST(OperationRequest, CarriesInstancesOfAnyContent) {
     }
 }
 
+TEST(OperationRequest, CarriesNewInstancesWithoutAPath) {
+    Instance made;
+    made.path = {"", "root/x", "A_Class", {{"Id", Value::ofString("1")}}};
+    made.properties = {{"Id", Value::ofString("1")}};
+    OperationRequest request("CreateInstance", "root/x");
+    request.instance("NewInstance", made);
+    ASSERT_THAT(test::violations(readXml(request.body(), 64)), IsEmpty());
+    const Call call = readCall(request.body(), 64);
+    const Instance back = Parameters(call).requiredInstance("NewInstance");
+    EXPECT_EQ(back.path, (ObjectPath{"", "", "A_Class", {}}));
+    EXPECT_EQ(back.properties, made.properties);
+}
+
 TEST(OperationRequest, NothingOfANamespaceGetsIntoAHeaderUnencoded) {
     EXPECT_EQ(OperationRequest("X", "root/cimv2").objectHeader(), "root/cimv2");
     EXPECT_EQ(OperationRequest("X", "a b\r\nEvil: 1/\xC3\xA4").objectHeader(),

@@ -33,7 +33,6 @@ std::vector<const ClassDeclaration*> classesBelow(Request& request) {
         classes = repository.withSubclasses(superclass);
         classes.erase(classes.begin());
     } else {
-        requireNameSpace(request);
         classes = repository.classes();
     }
     if (!deep) {

@@ -10,8 +10,10 @@
 
 namespace cimom::wbem {
 
-/// An attempt to change an instance, for the log.
+/// An attempt to change, create or delete an instance, for the log.
 struct Modification {
+    enum class Kind { modify, create, remove };
+
     struct Change {
         std::string property;
         std::optional<Value> oldValue;  ///< none: the instance could not be read before
@@ -19,10 +21,11 @@ struct Modification {
     };
 
     Caller caller;
-    ObjectPath object;
+    ObjectPath object;  ///< of a creation that failed the class
     std::vector<Change> changes;
     unsigned status = 0;  ///< CIM status code; 0: done
     std::string description;
+    Kind kind = Kind::modify;
 };
 
 }  // namespace cimom::wbem

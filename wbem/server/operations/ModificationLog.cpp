@@ -35,10 +35,22 @@ std::string valueText(const Value& value) {
     return text;
 }
 
+const char* verb(Modification::Kind kind) noexcept {
+    switch (kind) {
+        case Modification::Kind::create:
+            return "create";
+        case Modification::Kind::remove:
+            return "delete";
+        default:
+            return "modify";
+    }
+}
+
 }  // namespace
 
 std::string modificationText(const Modification& modification) {
-    std::string text = "modify user=";
+    std::string text = verb(modification.kind);
+    text += " user=";
     text += modification.caller.user ? '"' + *modification.caller.user + '"' : "none";
     text += " address=" + modification.caller.address + " object=" + toText(modification.object);
     for (const Modification::Change& change : modification.changes) {
@@ -46,9 +58,11 @@ std::string modificationText(const Modification& modification) {
         if (change.oldValue == change.newValue) {
             continue;
         }
-        text += ' ' + change.property + ": " +
-                (change.oldValue ? valueText(*change.oldValue) : "unknown") + " -> " +
-                valueText(change.newValue);
+        text += ' ' + change.property + ": ";
+        if (modification.kind == Modification::Kind::modify) {
+            text += (change.oldValue ? valueText(*change.oldValue) : "unknown") + " -> ";
+        }
+        text += valueText(change.newValue);
     }
     text += " status=";
     text += modification.status == 0 ? "OK" : cimStatusName(modification.status);

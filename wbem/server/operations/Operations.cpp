@@ -17,7 +17,8 @@ const Table& table() {
     static const Table all = [] {
         Table made;
         for (const auto& group :
-             {instanceOperations(), associationOperations(), classOperations(), pullOperations()}) {
+             {instanceOperations(), changingOperations(), associationOperations(),
+              classOperations(), qualifierOperations(), queryOperations(), pullOperations()}) {
             for (const NamedOperation& entry : group) {
                 made.emplace(entry.name, entry.operation);
             }
@@ -45,6 +46,8 @@ ResponseBody Operations::perform(const Call& call, const Caller& caller) {
     }
     try {
         Request request{manager_, sessions_, largestResult_, log_, call, caller, Parameters(call)};
+        // Clients try namespaces out, and go by this status alone.
+        requireNameSpace(request);
         return found->second(request);
     } catch (const CimError& error) {
         return ResponseBody(errorResponse(call, error.code, error.what()));

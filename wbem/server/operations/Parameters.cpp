@@ -122,6 +122,10 @@ Parameters::ObjectName Parameters::requiredObjectName(const char* name) {
     return {readPath(found), found.name == "CLASSNAME"};
 }
 
+Instance Parameters::requiredInstance(const char* name) {
+    return readInstance(required(name, valueOf(name, "INSTANCE")));
+}
+
 Instance Parameters::requiredNamedInstance(const char* name) {
     const XmlElement& found = required(name, valueOf(name, "VALUE.NAMEDINSTANCE"));
     expectNoText(found);

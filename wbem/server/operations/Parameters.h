@@ -34,6 +34,8 @@ class Parameters {
         bool isClass = false;
     };
     [[nodiscard]] ObjectName requiredObjectName(const char* name);
+    /// INSTANCE; its path holds the class alone.
+    [[nodiscard]] Instance requiredInstance(const char* name);
     /// VALUE.NAMEDINSTANCE; the instance has the path of the INSTANCENAME. Throws
     /// CimError when the two disagree about the class.
     [[nodiscard]] Instance requiredNamedInstance(const char* name);

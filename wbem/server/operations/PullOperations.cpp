@@ -10,6 +10,7 @@
 #include "cimxml/XmlText.h"
 #include "operations/PulledRecords.h"
 #include "operations/Request.h"
+#include "operations/RequestedQuery.h"
 
 namespace cimom::wbem {
 
@@ -26,21 +27,27 @@ struct Opening {
     std::uint32_t portion = 0;
 };
 
-Opening readOpening(Request& request) {
+/// What is behind the query of a filter.
+Opening readPortions(Request& request) {
     Parameters& parameters = request.parameters;
-    const auto language = parameters.text("FilterQueryLanguage");
-    const auto query = parameters.text("FilterQuery");
     const bool continueOnError = parameters.flag("ContinueOnError", false);
     const auto timeout = parameters.number("OperationTimeout");
     const std::uint32_t portion = parameters.number("MaxObjectCount").value_or(0);
     parameters.finish();
-    if (language || query) {
-        throw CimError(CimStatus::filteredEnumerationNotSupported, "");
-    }
     if (continueOnError) {
         throw CimError(CimStatus::continuationOnErrorNotSupported, "");
     }
     return {request.sessions.timeoutFor(timeout), std::min(portion, largestPortion)};
+}
+
+Opening readOpening(Request& request) {
+    const auto language = request.parameters.text("FilterQueryLanguage");
+    const auto query = request.parameters.text("FilterQuery");
+    const Opening opening = readPortions(request);
+    if (language || query) {
+        throw CimError(CimStatus::filteredEnumerationNotSupported, "");
+    }
+    return opening;
 }
 
 /// The objects of one response.
@@ -74,38 +81,40 @@ std::string sequenceState(const std::string& context) {
 
 enum class Form { path, instance, instanceWithPath };
 
-ResponseBody portionResponse(Request& request, Portion portion, Form form) {
-    return {responseHead(request.call) + "<IRETURNVALUE>",
-            [reader = std::move(portion.reader), form](std::string& out) mutable {
-                const auto record = reader.next();
-                if (!record) {
-                    return false;
-                }
-                const bool both = form == Form::instanceWithPath;
-                out += both ? "<VALUE.INSTANCEWITHPATH>" : "";
-                out += form == Form::instance ? "" : record->path;
-                out += record->object;
-                out += both ? "</VALUE.INSTANCEWITHPATH>" : "";
-                return true;
-            },
-            "</IRETURNVALUE>" + sequenceState(portion.context) + responseTail(request.call)};
+/// `further`: output parameters in front of the others.
+ResponseBody portionResponse(Request& request, Portion portion, Form form,
+                             const std::string& further = "") {
+    return {
+        responseHead(request.call) + "<IRETURNVALUE>",
+        [reader = std::move(portion.reader), form](std::string& out) mutable {
+            const auto record = reader.next();
+            if (!record) {
+                return false;
+            }
+            const bool both = form == Form::instanceWithPath;
+            out += both ? "<VALUE.INSTANCEWITHPATH>" : "";
+            out += form == Form::instance ? "" : record->path;
+            out += record->object;
+            out += both ? "</VALUE.INSTANCEWITHPATH>" : "";
+            return true;
+        },
+        "</IRETURNVALUE>" + further + sequenceState(portion.context) + responseTail(request.call)};
 }
 
 /// Responds with the first portion, and keeps what is left.
-ResponseBody begin(Request& request, const Opening& opening, Session::Kind kind,
-                   const SpooledResult& result) {
+ResponseBody begin(Request& request, const Opening& opening, Session::Kind kind, Form form,
+                   const SpooledResult& result, const std::string& further = "") {
     Session session{kind, result.spool, 0, result.count, opening.timeout, request.caller.user};
     Portion portion = takePortion(session, opening.portion, "");
     if (session.left > 0) {
         portion.context = request.sessions.open(std::move(session));
     }
-    return portionResponse(request, std::move(portion),
-                           kind == Session::Kind::paths ? Form::path : Form::instanceWithPath);
+    return portionResponse(request, std::move(portion), form, further);
 }
 
 template <typename Ask>
 ResponseBody openPaths(Request& request, const Opening& opening, Ask&& ask) {
-    return begin(request, opening, Session::Kind::paths,
+    return begin(request, opening, Session::Kind::paths, Form::path,
                  spooled<ObjectPath>(
                      request,
                      [&host = request.manager.host(), text = std::string()](
@@ -117,24 +126,52 @@ ResponseBody openPaths(Request& request, const Opening& opening, Ask&& ask) {
                      std::forward<Ask>(ask)));
 }
 
-/// `cut`: the class to whose properties the instances are cut; null: all are shown.
+/// Writes instances as records, with class origins if there is a repository to tell them.
+/// `cut`: the class to whose properties they are cut; null: all are shown.
+SpoolingReceiver<Instance>::Write recordWriter(const Request& request,
+                                               const ClassRepository* origins,
+                                               const ClassDeclaration* cut) {
+    return [&host = request.manager.host(), origins, cut, path = std::string(),
+            text = std::string()](std::string& out, Instance& instance) mutable {
+        cutToClass(instance, cut);
+        path.clear();
+        text.clear();
+        writeInstancePath(path, instance.path, host);
+        writeInstanceOf(text, instance, origins);
+        appendRecord(out, path, text);
+    };
+}
+
 template <typename Ask>
 ResponseBody openInstances(Request& request, const Opening& opening, bool classOrigin,
                            const ClassDeclaration* cut, Ask&& ask) {
     const ClassRepository* const origins = classOrigin ? &request.manager.repository() : nullptr;
-    return begin(request, opening, Session::Kind::instances,
-                 spooled<Instance>(
-                     request,
-                     [&host = request.manager.host(), origins, cut, path = std::string(),
-                      text = std::string()](std::string& out, Instance& instance) mutable {
-                         cutToClass(instance, cut);
-                         path.clear();
-                         text.clear();
-                         writeInstancePath(path, instance.path, host);
-                         writeInstanceOf(text, instance, origins);
-                         appendRecord(out, path, text);
-                     },
-                     std::forward<Ask>(ask)));
+    return begin(
+        request, opening, Session::Kind::instances, Form::instanceWithPath,
+        spooled<Instance>(request, recordWriter(request, origins, cut), std::forward<Ask>(ask)));
+}
+
+ResponseBody openQueryInstances(Request& request) {
+    const RequestedQuery query = requiredQuery(request, "FilterQueryLanguage", "FilterQuery");
+    const bool wantsClass = request.parameters.flag("ReturnQueryResultClass", false);
+    const Opening opening = readPortions(request);
+    std::string resultClass;
+    if (wantsClass) {
+        ClassForm form;
+        form.propertyList = query.query.properties();
+        resultClass = R"(<PARAMVALUE NAME="QueryResultClass">)";
+        writeClass(resultClass, query.declaration, form);
+        resultClass += "</PARAMVALUE>";
+    }
+    return begin(request, opening, Session::Kind::instances, Form::instance,
+                 spooled<Instance>(request, recordWriter(request, nullptr, nullptr),
+                                   [&](auto& receiver) {
+                                       return request.manager.execQuery(
+                                           request.call.nameSpace, query.query,
+                                           {std::nullopt, request.caller.user.value_or("")},
+                                           receiver);
+                                   }),
+                 resultClass);
 }
 
 ResponseBody openEnumerateInstances(Request& request) {
@@ -241,8 +278,8 @@ ResponseBody pullInstancePaths(Request& request) {
     return pull(request, Session::Kind::paths, Form::path);
 }
 
-/// DSP0200 defines this operation for queries, which are not served. Here a client may
-/// use it for any instances whose paths it does not need.
+/// DSP0200 defines this operation for queries. Here a client may use it for any instances
+/// whose paths it does not need.
 ResponseBody pullInstances(Request& request) {
     return pull(request, Session::Kind::instances, Form::instance);
 }
@@ -270,6 +307,7 @@ std::vector<NamedOperation> pullOperations() {
     return {
         {"OpenEnumerateInstances", openEnumerateInstances},
         {"OpenEnumerateInstancePaths", openEnumerateInstancePaths},
+        {"OpenQueryInstances", openQueryInstances},
         {"OpenAssociatorInstances", [](Request& request) { return openAssociated(request, true); }},
         {"OpenAssociatorInstancePaths",
          [](Request& request) { return openAssociatedPaths(request, true); }},

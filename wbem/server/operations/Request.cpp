@@ -34,10 +34,7 @@ void nameBareKey(NamedValue& key, const ClassDeclaration* declaration) {
 }  // namespace
 
 void requireNameSpace(const Request& request) {
-    const auto& known = request.manager.nameSpaces();
-    if (std::none_of(known.begin(), known.end(), [&request](const std::string& one) {
-            return sameName(one, request.call.nameSpace);
-        })) {
+    if (request.manager.findNameSpace(request.call.nameSpace) == nullptr) {
         throw CimError(CimStatus::invalidNamespace,
                        "no namespace \"" + request.call.nameSpace + "\"");
     }
@@ -45,7 +42,6 @@ void requireNameSpace(const Request& request) {
 
 const ClassDeclaration& requireClass(const Request& request, const std::string& className,
                                      CimStatus unknown) {
-    requireNameSpace(request);
     const ClassDeclaration* const declaration = request.manager.repository().find(className);
     if (declaration == nullptr) {
         throw CimError(unknown, "no class \"" + className + "\"");

@@ -44,11 +44,13 @@ struct NamedOperation {
 [[nodiscard]] std::vector<NamedOperation> associationOperations();
 [[nodiscard]] std::vector<NamedOperation> classOperations();
 [[nodiscard]] std::vector<NamedOperation> pullOperations();
-[[nodiscard]] ResponseBody modifyInstance(Request& request);
+[[nodiscard]] std::vector<NamedOperation> changingOperations();
+[[nodiscard]] std::vector<NamedOperation> queryOperations();
+[[nodiscard]] std::vector<NamedOperation> qualifierOperations();
 
-/// The class of the call's namespace. Throws CimError for a namespace that there
-/// is not, or with `unknown` for an unknown class.
+/// Throws CimError for a namespace that there is not.
 void requireNameSpace(const Request& request);
+/// The class. Throws CimError with `unknown` for an unknown one.
 [[nodiscard]] const ClassDeclaration& requireClass(const Request& request,
                                                    const std::string& className, CimStatus unknown);
 

@@ -26,6 +26,18 @@ TEST(Modification, TellsWhoDidWhat) {
               R"("new" N: unknown -> {1, null} status=OK)");
 }
 
+TEST(Modification, TellsOfCreationsAndDeletions) {
+    Modification made = modification();
+    made.kind = Modification::Kind::create;
+    made.changes = {{"k", std::nullopt, Value::ofString("v")}};
+    EXPECT_EQ(modificationText(made),
+              R"(create user=none address=192.0.2.7 object=root/x:A.k="v" k: "v" status=OK)");
+    made.kind = Modification::Kind::remove;
+    made.changes.clear();
+    EXPECT_EQ(modificationText(made),
+              R"(delete user=none address=192.0.2.7 object=root/x:A.k="v" status=OK)");
+}
+
 TEST(Modification, TellsWhyItWasNotDone) {
     Modification made = modification();
     made.status = 2;

@@ -317,10 +317,8 @@ TEST_F(WbemOperations, EveryFailureHasTheStatusOfTheStandard) {
 }
 
 TEST_F(WbemOperations, WhatIsNotServedSaysSo) {
-    for (const char* method :
-         {"CreateInstance", "DeleteInstance", "ExecQuery", "CreateClass", "ModifyClass",
-          "DeleteClass", "GetProperty", "SetProperty", "GetQualifier", "SetQualifier",
-          "DeleteQualifier", "EnumerateQualifiers", "OpenQueryInstances", "MakeCoffee"}) {
+    for (const char* method : {"CreateClass", "ModifyClass", "DeleteClass", "GetProperty",
+                               "SetProperty", "SetQualifier", "DeleteQualifier", "MakeCoffee"}) {
         EXPECT_EQ(failure(method, ""),
                   std::string("7 the operation ") + method + " is not offered");
     }

@@ -32,6 +32,9 @@ void writeReference(std::string& out, const ObjectPath& path);
 /// written as the texts of their paths.
 void writeInstance(std::string& out, const Instance& instance, const ClassDeclaration* origins);
 
+/// QUALIFIER.DECLARATION.
+void writeQualifierType(std::string& out, const QualifierType& type);
+
 /// What of a class is written.
 struct ClassForm {
     bool localOnly = false;

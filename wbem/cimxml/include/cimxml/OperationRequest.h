@@ -27,6 +27,8 @@ class OperationRequest {
     OperationRequest& className(const char* name, const std::optional<std::string>& value);
     /// INSTANCENAME: without the namespace, which is the request's own.
     OperationRequest& instanceName(const char* name, const ObjectPath& path);
+    /// INSTANCE.
+    OperationRequest& instance(const char* name, const Instance& value);
     /// VALUE.NAMEDINSTANCE.
     OperationRequest& namedInstance(const char* name, const Instance& instance);
 

@@ -1,9 +1,14 @@
+// Operations that change instances, create and delete them (DSP0200, 5.4.2). Each attempt
+// is logged, also one that is refused.
 #include <algorithm>
+#include <utility>
 
 #include "cimom/ClassDeclaration.h"
 #include "cimom/ClassRepository.h"
 #include "cimom/Names.h"
 #include "cimom/Results.h"
+#include "cimxml/ObjectWriter.h"
+#include "cimxml/PathLocation.h"
 #include "operations/Modification.h"
 #include "operations/Request.h"
 
@@ -69,19 +74,40 @@ std::vector<Modification::Change> changesOf(const Instance& instance, const Inst
     return changes;
 }
 
+/// The properties that the client gave, as long as nothing is known of what was before.
+std::vector<Modification::Change> givenBy(const Instance& instance) {
+    std::vector<Modification::Change> changes;
+    for (const NamedValue& property : instance.properties) {
+        changes.push_back({property.name, std::nullopt, property.value});
+    }
+    return changes;
+}
+
+/// Runs `change` if the client may change anything, and logs the attempt however it ends.
+template <typename Change>
+void logged(Request& request, Modification& modification, Change&& change) {
+    try {
+        if (!request.caller.mayModify) {
+            throw CimError(CimStatus::accessDenied, "this needs the right to modify");
+        }
+        std::forward<Change>(change)();
+    } catch (const CimError& error) {
+        modification.status = error.code;
+        modification.description = error.what();
+        request.log(modification);
+        throw;
+    }
+    request.log(modification);
+}
+
 void modify(Request& request, const Instance& instance, const InstanceRequest& how,
             Modification& modification) {
-    if (!request.caller.mayModify) {
-        throw CimError(CimStatus::accessDenied, "this needs the right to modify");
-    }
     checkProperties(instance,
                     requireClass(request, instance.path.className, CimStatus::invalidClass),
                     how.propertyList);
     modification.changes = changesOf(instance, how, request.manager);
     requireOk(request.manager.modifyInstance(instance, how).status);
 }
-
-}  // namespace
 
 ResponseBody modifyInstance(Request& request) {
     Instance instance = request.parameters.requiredNamedInstance("ModifiedInstance");
@@ -91,20 +117,64 @@ ResponseBody modifyInstance(Request& request) {
     const InstanceRequest how{request.parameters.texts("PropertyList"),
                               request.caller.user.value_or("")};
     request.parameters.finish();
-    Modification modification{request.caller, instance.path, {}, 0, ""};
-    for (const NamedValue& property : instance.properties) {
-        modification.changes.push_back({property.name, std::nullopt, property.value});
-    }
-    try {
-        modify(request, instance, how, modification);
-    } catch (const CimError& error) {
-        modification.status = error.code;
-        modification.description = error.what();
-        request.log(modification);
-        throw;
-    }
-    request.log(modification);
+    Modification modification{request.caller, instance.path, givenBy(instance), 0, ""};
+    logged(request, modification, [&] { modify(request, instance, how, modification); });
     return plainResponse(request.call, "");
+}
+
+/// The path of the new instance.
+ObjectPath create(Request& request, const Instance& instance) {
+    const ClassDeclaration& declaration =
+        requireClass(request, instance.path.className, CimStatus::invalidClass);
+    try {
+        checkProperties(instance, declaration, std::nullopt);
+    } catch (const CimError& error) {
+        // DSP0200 has one status for whatever is wrong with a new instance.
+        throw CimError(CimStatus::invalidParameter, error.what());
+    }
+    auto made =
+        request.manager.createInstance(instance, {std::nullopt, request.caller.user.value_or("")});
+    requireOk(made.status);
+    if (made.paths.empty() || !made.paths.front()) {
+        throw CimError(CimStatus::failed, "the new instance has no path");
+    }
+    return *std::move(made.paths.front());
+}
+
+ResponseBody createInstance(Request& request) {
+    Instance instance = request.parameters.requiredInstance("NewInstance");
+    request.parameters.finish();
+    locate(instance, request.call.nameSpace);
+    Modification modification{
+        request.caller, instance.path, givenBy(instance), 0, "", Modification::Kind::create};
+    ObjectPath path;
+    logged(request, modification, [&] {
+        path = create(request, instance);
+        modification.object = path;
+    });
+    std::string content = "<IRETURNVALUE>";
+    writeInstanceName(content, path);
+    return plainResponse(request.call, content + "</IRETURNVALUE>");
+}
+
+ResponseBody deleteInstance(Request& request) {
+    const ObjectPath path =
+        located(request, request.parameters.requiredInstanceName("InstanceName"));
+    request.parameters.finish();
+    Modification modification{request.caller, path, {}, 0, "", Modification::Kind::remove};
+    logged(request, modification, [&] {
+        requireOk(
+            request.manager.deleteInstance(path, {std::nullopt, request.caller.user.value_or("")}));
+    });
+    return plainResponse(request.call, "");
+}
+
+}  // namespace
+
+std::vector<NamedOperation> changingOperations() {
+    return {{"ModifyInstance", modifyInstance},
+            {"CreateInstance", createInstance},
+            {"DeleteInstance", deleteInstance}};
 }
 
 }  // namespace cimom::wbem
