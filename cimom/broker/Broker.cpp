@@ -1,5 +1,9 @@
 #include "broker/Broker.h"
 
+#include <algorithm>
+#include <chrono>
+#include <thread>
+
 #include "broker/BrokerTables.h"
 #include "broker/RequestScope.h"
 #include "broker/objects/BrokerContext.h"
@@ -65,6 +69,20 @@ CMPIrc Broker::detachThread(const CMPIContext* context) {
         prepared_.erase(found);
     }
     return CMPI_RC_OK;
+}
+
+bool Broker::hasThreads() {
+    const std::lock_guard lock(mutex_);
+    return std::ranges::any_of(prepared_,
+                               [](const auto& each) { return each.second.threads != 0; });
+}
+
+void Broker::close() {
+    constexpr std::chrono::milliseconds pause(1);
+    handler_ = nullptr;
+    while (askings_ != 0) {
+        std::this_thread::sleep_for(pause);
+    }
 }
 
 }  // namespace cimom::broker

@@ -2,6 +2,7 @@
 
 #include <cmpift.h>
 
+#include <atomic>
 #include <memory>
 #include <mutex>
 #include <unordered_map>
@@ -31,8 +32,20 @@ class Broker {
     static Broker* of(const CMPIBroker* record) noexcept;
 
     [[nodiscard]] const ClassRepository& classes() const noexcept { return *classes_; }
-    [[nodiscard]] RequestHandler* handler() const noexcept { return handler_; }
     [[nodiscard]] IndicationSink* sink() const noexcept { return sink_; }
+
+    /// Who is asked, as long as it lives; null without a handler, and after close().
+    class Asking {
+      public:
+        explicit Asking(Broker& broker) noexcept : broker_(broker) { ++broker_.askings_; }
+        ~Asking() { --broker_.askings_; }
+        Asking(const Asking&) = delete;
+        Asking& operator=(const Asking&) = delete;
+        [[nodiscard]] RequestHandler* handler() const noexcept { return broker_.handler_.load(); }
+
+      private:
+        Broker& broker_;
+    };
     [[nodiscard]] MemoryPool& memory() noexcept { return memory_; }
 
     /// A copy of the context for a thread of the provider; owned by the broker
@@ -41,6 +54,12 @@ class Broker {
     /// Attaches the calling thread with a prepared context.
     CMPIrc attachThread(const CMPIContext* context);
     CMPIrc detachThread(const CMPIContext* context);
+    /// Whether a thread has attached itself and not detached.
+    [[nodiscard]] bool hasThreads();
+
+    /// From here on it asks nobody: for one whose provider has left a thread behind, when who
+    /// is asked ends. Waits until no request is under way.
+    void close();
 
   private:
     struct Released {
@@ -53,7 +72,8 @@ class Broker {
     };
 
     const ClassRepository* classes_;
-    RequestHandler* handler_;
+    std::atomic<RequestHandler*> handler_;
+    std::atomic<unsigned> askings_{0};
     IndicationSink* sink_;
     CMPIBroker record_;
     MemoryPool memory_;

@@ -68,19 +68,21 @@ std::optional<std::string> textOrNone(const char* text) {
 /// CMPIStatus of the status that it gives. The request gets handler and path.
 template <typename Request>
 CMPIStatus ask(const CMPIBroker* mb, const CMPIObjectPath* op, Request&& request) {
-    const Broker* const broker = Broker::of(mb);
+    Broker* const broker = Broker::of(mb);
     const PathRecord* const path = pathOf(op);
     if (broker == nullptr) {
         return statusOf(CMPI_RC_ERR_INVALID_HANDLE);
     }
+    const Broker::Asking asking(*broker);
+    RequestHandler* const handler = asking.handler();
     if (path == nullptr) {
         return statusOf(CMPI_RC_ERR_INVALID_PARAMETER);
     }
-    if (broker->handler() == nullptr) {
+    if (handler == nullptr) {
         return statusOf(CMPI_RC_ERR_NOT_SUPPORTED);
     }
     try {
-        const Status status = std::forward<Request>(request)(*broker->handler(), toModel(*path));
+        const Status status = std::forward<Request>(request)(*handler, toModel(*path));
         CMPIString* const message =
             status.message.empty() ? nullptr
                                    : makeString(RequestScope::current().arena(), status.message);

@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <array>
+#include <mutex>
 #include <utility>
 
 #include "cimom/ClassDeclaration.h"
@@ -69,7 +70,23 @@ void ObjectManager::Implementation::orderAssociations() {
 }
 
 ObjectManager::Implementation::~Implementation() {
-    filters_.close();
+    static_cast<void>(end());
+}
+
+bool ObjectManager::Implementation::end() {
+    if (!std::exchange(ending_, true)) {
+        filters_.close();
+        return !providers_ || providers_->end();
+    }
+    return true;
+}
+
+void ObjectManager::Implementation::leave(std::unique_ptr<Implementation> left) {
+    static std::mutex mutex;
+    static Implementation* latest = nullptr;
+    const std::lock_guard lock(mutex);
+    left->leftBefore_ = latest;
+    latest = left.release();
 }
 
 void ObjectManager::Implementation::serve(const Registration& registration) {
@@ -173,7 +190,11 @@ CallSettings ObjectManager::Implementation::settings(const std::string& principa
 ObjectManager::ObjectManager(Configuration configuration)
     : implementation_(std::make_unique<Implementation>(*this, std::move(configuration))) {}
 
-ObjectManager::~ObjectManager() = default;
+ObjectManager::~ObjectManager() {
+    if (!implementation_->end()) {
+        Implementation::leave(std::move(implementation_));
+    }
+}
 
 const ClassRepository& ObjectManager::repository() const noexcept {
     return implementation_->repository();

@@ -38,6 +38,11 @@ class ObjectManager::Implementation {
   public:
     Implementation(ObjectManager& manager, Configuration configuration);
     ~Implementation();
+    /// Ends subscriptions and providers. False when a provider has left a thread behind,
+    /// which needs all of this.
+    [[nodiscard]] bool end();
+    /// Keeps it until the process ends.
+    static void leave(std::unique_ptr<Implementation> left);
     Implementation(const Implementation&) = delete;
     Implementation& operator=(const Implementation&) = delete;
 
@@ -191,6 +196,8 @@ class ObjectManager::Implementation {
         servedByName_;
     ServedClasses associations_;  ///< all, in the order of the repository
     std::vector<std::string> nameSpaces_;
+    bool ending_ = false;
+    Implementation* leftBefore_ = nullptr;  ///< another one that is kept
     ActiveFilters filters_{{repository_, nameSpaces_, configuration_.host, configuration_.log}};
     /// Ends first: a provider that is being cleaned up may still ask.
     std::optional<Providers> providers_;

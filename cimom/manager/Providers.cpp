@@ -1,6 +1,8 @@
 #include "manager/Providers.h"
 
 #include <algorithm>
+#include <chrono>
+#include <thread>
 #include <utility>
 
 #include "broker/RequestScope.h"
@@ -175,13 +177,42 @@ void Providers::cleanUp(Provider& provider) {
     end(provider.association_.exchange(nullptr), "Association");
 }
 
-Providers::~Providers() {
+bool Providers::end() {
     {
         const std::lock_guard lock(mutex_);
         closing_ = true;
     }
     for (const auto& provider : providers_) {
         cleanUp(*provider);
+    }
+    bool ended = true;
+    for (const Loaded& loaded : loaded_) {
+        if (!threadsEnd(*loaded.broker)) {
+            loaded.broker->close();
+            ended = false;
+        }
+    }
+    return ended;
+}
+
+/// Whether the threads of a provider end, which its cleanup should have awaited.
+bool Providers::threadsEnd(broker::Broker& broker) {
+    constexpr std::chrono::seconds patience(1);
+    constexpr std::chrono::milliseconds pause(5);
+    const auto end = std::chrono::steady_clock::now() + patience;
+    while (broker.hasThreads()) {
+        if (std::chrono::steady_clock::now() >= end) {
+            return false;
+        }
+        std::this_thread::sleep_for(pause);
+    }
+    return true;
+}
+
+Providers::~Providers() {
+    if (!closing_) {
+        // Who keeps them alone has nothing that could stay for a thread.
+        static_cast<void>(end());
     }
 }
 

@@ -64,6 +64,10 @@ class Providers {
     Providers(const Providers&) = delete;
     Providers& operator=(const Providers&) = delete;
 
+    /// Cleans every provider up. False when one has left a thread behind, which goes on using
+    /// its library and what the providers were made with: then both must stay for ever.
+    [[nodiscard]] bool end();
+
     /// The provider of that name in that library; loads nothing.
     Provider& provider(const std::string& location, const std::string& name);
 
@@ -78,6 +82,7 @@ class Providers {
     };
     Loaded& load(const std::string& location);
     void cleanUp(Provider& provider);
+    static bool threadsEnd(broker::Broker& broker);
 
     const std::vector<std::filesystem::path> directories_;
     const ClassRepository& classes_;

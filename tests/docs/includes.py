@@ -23,7 +23,7 @@ ORDERS = {
     "platform/linux": [["formats"], ["kernel", "ipmi"], ["facts"],
                        ["clients", "configuration"], ["."]],
     "provider": [["include"], ["Lindows"], ["CMPI"], ["."]],
-    "cimom": [["model"], ["mof"], ["broker", "broker/objects"], ["manager"]],
+    "cimom": [["model"], ["mof"], ["query"], ["broker", "broker/objects"], ["manager"], ["interop"]],
     "wbem/server": [["operations"], ["http"]],
     "cimdhcp": [["text"], ["client"], ["arguments"], ["commands"], ["."]],
 }

@@ -283,6 +283,25 @@ TEST_F(Indications, TheEndOfTheManagerEndsActiveFilters) {
     EXPECT_EQ(received_.all().size(), 2U);
 }
 
+TEST_F(Indications, AThreadThatAProviderLeavesBehindRunsIntoNothing) {
+    start({{"CIM_InstDeletion", "Plain"}});
+    auto active = activate("SELECT * FROM CIM_InstDeletion", received_.receiver());
+    std::atomic<bool> over = false;
+    void* detached = nullptr;
+    std::thread thread(
+        [&] { detached = function<void* (*)(void*)>("tellingThreadThatStays")(&over); });
+    while (received_.all().empty()) {
+        std::this_thread::yield();
+    }
+    manager_.reset();
+    const std::size_t told = received_.all().size();
+    std::this_thread::sleep_for(std::chrono::milliseconds(20));
+    EXPECT_EQ(received_.all().size(), told);
+    over = true;
+    thread.join();
+    EXPECT_EQ(detached, &over) << "its broker is still there";
+}
+
 TEST_F(Indications, AfterItsEndAReceiverIsNeverCalled) {
     start({{"CIM_InstCreation", "Plain"}});
     std::atomic<bool> over = false;

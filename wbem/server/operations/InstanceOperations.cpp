@@ -3,6 +3,7 @@
 
 #include "cimom/ClassDeclaration.h"
 #include "cimom/ClassRepository.h"
+#include "cimom/Interop.h"
 #include "cimom/Names.h"
 #include "cimom/Results.h"
 #include "cimxml/ObjectWriter.h"
@@ -30,42 +31,6 @@ InstanceRequest readingRequest(Request& request) {
     return {request.parameters.texts("PropertyList"), request.caller.user.value_or("")};
 }
 
-ResponseBody enumerateInstances(Request& request) {
-    const std::string className = request.parameters.requiredClassName("ClassName");
-    const bool deep = request.parameters.flag("DeepInheritance", true);
-    passOverDeprecated(request);
-    const ClassRepository* const origins = originsWanted(request);
-    const InstanceRequest reading = readingRequest(request);
-    request.parameters.finish();
-    const ClassDeclaration* const cut =
-        deep ? nullptr : request.manager.repository().find(className);
-    return spooledResponse(request.call, spooled<Instance>(
-                                             request,
-                                             [origins, cut](std::string& out, Instance& instance) {
-                                                 cutToClass(instance, cut);
-                                                 out += "<VALUE.NAMEDINSTANCE>";
-                                                 writeInstanceName(out, instance.path);
-                                                 writeInstanceOf(out, instance, origins);
-                                                 out += "</VALUE.NAMEDINSTANCE>";
-                                             },
-                                             [&](auto& receiver) {
-                                                 return request.manager.enumerateInstances(
-                                                     classPath(request, className), reading,
-                                                     receiver);
-                                             }));
-}
-
-ResponseBody enumerateInstanceNames(Request& request) {
-    const std::string className = request.parameters.requiredClassName("ClassName");
-    request.parameters.finish();
-    const InstanceRequest reading{std::nullopt, request.caller.user.value_or("")};
-    return spooledResponse(request.call,
-                           spooled<ObjectPath>(request, writeInstanceName, [&](auto& receiver) {
-                               return request.manager.enumerateInstanceNames(
-                                   classPath(request, className), reading, receiver);
-                           }));
-}
-
 /// Adds what the class has and the provider left out, as null: clients that modify
 /// an instance want to see what there is to set.
 void addNulls(Instance& instance, const ClassRepository& repository,
@@ -84,6 +49,55 @@ void addNulls(Instance& instance, const ClassRepository& repository,
                 {property.name, Value::null(property.type, property.isArray)});
         }
     }
+}
+
+/// Whether the enumerations of the request's namespace show what GetInstance shows: clients
+/// compare the two for what they find of the server in the interop namespace, where instances
+/// are few.
+bool showsNulls(const Request& request) {
+    const std::string* const nameSpace = request.manager.findNameSpace(request.call.nameSpace);
+    return nameSpace != nullptr && sameName(*nameSpace, interopNameSpace);
+}
+
+ResponseBody enumerateInstances(Request& request) {
+    const std::string className = request.parameters.requiredClassName("ClassName");
+    const bool deep = request.parameters.flag("DeepInheritance", true);
+    passOverDeprecated(request);
+    const ClassRepository* const origins = originsWanted(request);
+    const InstanceRequest reading = readingRequest(request);
+    request.parameters.finish();
+    const ClassDeclaration* const cut =
+        deep ? nullptr : request.manager.repository().find(className);
+    return spooledResponse(request.call,
+                           spooled<Instance>(
+                               request,
+                               [&request, &reading, nulls = showsNulls(request), origins, cut](
+                                   std::string& out, Instance& instance) {
+                                   if (nulls) {
+                                       addNulls(instance, request.manager.repository(),
+                                                reading.propertyList);
+                                   }
+                                   cutToClass(instance, cut);
+                                   out += "<VALUE.NAMEDINSTANCE>";
+                                   writeInstanceName(out, instance.path);
+                                   writeInstanceOf(out, instance, origins);
+                                   out += "</VALUE.NAMEDINSTANCE>";
+                               },
+                               [&](auto& receiver) {
+                                   return request.manager.enumerateInstances(
+                                       classPath(request, className), reading, receiver);
+                               }));
+}
+
+ResponseBody enumerateInstanceNames(Request& request) {
+    const std::string className = request.parameters.requiredClassName("ClassName");
+    request.parameters.finish();
+    const InstanceRequest reading{std::nullopt, request.caller.user.value_or("")};
+    return spooledResponse(request.call,
+                           spooled<ObjectPath>(request, writeInstanceName, [&](auto& receiver) {
+                               return request.manager.enumerateInstanceNames(
+                                   classPath(request, className), reading, receiver);
+                           }));
 }
 
 ResponseBody getInstance(Request& request) {

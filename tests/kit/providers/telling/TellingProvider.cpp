@@ -3,6 +3,7 @@
 #include <cmpift.h>
 
 #include <array>
+#include <atomic>
 #include <mutex>
 #include <stdexcept>
 #include <string>
@@ -138,6 +139,7 @@ CMPI_EXTERN_C const char* tellingTakeCalls();
 CMPI_EXTERN_C CMPIrc tellingTell(const char* nameSpace, const char* className,
                                  const char* identifier);
 CMPI_EXTERN_C void* tellingThread(void* identifier);
+CMPI_EXTERN_C void* tellingThreadThatStays(void* until);
 CMPI_EXTERN_C const CMPIBroker* tellingBroker();
 
 CMPIIndicationMI* _Generic_Create_IndicationMI(const CMPIBroker* host, const CMPIContext*,
@@ -181,6 +183,20 @@ void* tellingThread(void* identifier) {
         tell(context, "root/cimv2", "CIM_InstDeletion", static_cast<const char*>(identifier));
     const CMPIrc detached = broker->bft->detachThread(broker, context).rc;
     return told == CMPI_RC_OK && detached == CMPI_RC_OK ? identifier : nullptr;
+}
+
+/// Attaches, and uses the broker until the flag is set, whatever happens to the provider.
+/// Gives its parameter when it could detach in the end.
+void* tellingThreadThatStays(void* until) {
+    const auto& over = *static_cast<const std::atomic<bool>*>(until);
+    CMPIContext* const context = threadContext;
+    if (broker->bft->attachThread(broker, context).rc != CMPI_RC_OK) {
+        return nullptr;
+    }
+    while (!over) {
+        tell(context, "root/cimv2", "CIM_InstDeletion", "from behind");
+    }
+    return broker->bft->detachThread(broker, context).rc == CMPI_RC_OK ? until : nullptr;
 }
 
 const CMPIBroker* tellingBroker() {

@@ -14,6 +14,7 @@
 #include "LiveMachine.h"
 #include "kit/Diagnostics.h"
 #include "kit/Namespaces.h"
+#include "zrclient/InstrumentationService.h"
 #include "zrcommon/UniqueFd.h"
 #include "zrlinux/LiveSource.h"
 
@@ -61,6 +62,58 @@ TEST(Kernel, AMachineWithoutANameShowsItsInterfaces) {
         EXPECT_EQ(machine.now().find(0, Properties::Name)->value, PropertyValue{});
         EXPECT_THAT(ZR::Testing::textsOf(machine.now().diagnostics()),
                     Contains("the system has no name"));
+    }));
+}
+
+TEST(Kernel, AMachineThatRestsAsksForNothing) {
+    ZR_NEEDS_NAMESPACES();
+    EXPECT_TRUE(passesInNamespaces(30, [] {
+        const auto source = openLiveSource();
+        static_cast<void>(source->read());
+        const auto now = std::chrono::steady_clock::now();
+        const ChangeSigns alone = source->signs();
+        ASSERT_TRUE(alone.descriptor);
+        ASSERT_TRUE(alone.askAt) << "a service processor may come";
+        EXPECT_GT(*alone.askAt - now, std::chrono::seconds{50}) << "and nothing else, beside lo";
+        run("ip link add br0 type bridge");
+        while (source->changed()) {
+            static_cast<void>(source->read());
+        }
+        const ChangeSigns linked = source->signs();
+        ASSERT_TRUE(linked.askAt);
+        EXPECT_LE(*linked.askAt - std::chrono::steady_clock::now(), std::chrono::milliseconds{1001})
+            << "clients may come";
+    }));
+}
+
+TEST(Kernel, WhoWaitsIsWokenByTheKernelAndByFiles) {
+    ZR_NEEDS_NAMESPACES();
+    EXPECT_TRUE(passesInNamespaces(60, [] {
+        InstrumentationService service(openLiveSource());
+        InstrumentationService::Waiter waiter(service);
+        auto known = waiter.next(nullptr);
+        std::atomic<int> seen = 0;
+        std::thread watching([&] {
+            while (const auto next = waiter.next(known)) {
+                known = next;
+                ++seen;
+            }
+        });
+        const auto wakes = [&](const char* command) {
+            const int before = seen;
+            run(command);
+            const auto end = std::chrono::steady_clock::now() + std::chrono::seconds{10};
+            while (seen == before && std::chrono::steady_clock::now() < end) {
+                std::this_thread::sleep_for(std::chrono::milliseconds{2});
+            }
+            EXPECT_GT(seen, before) << command;
+        };
+        wakes("ip link add br0 type bridge");
+        wakes("ip addr add 192.0.2.1/24 dev br0");
+        wakes("mkdir -p /var/lib/dhcp && echo > /var/lib/dhcp/dhclient.leases");
+        wakes("ip link del br0");
+        waiter.stop();
+        watching.join();
     }));
 }
 

@@ -4,6 +4,7 @@
 
 #include "cimom/Interop.h"
 #include "cimxml/ObjectReader.h"
+#include "kit/TemporaryDirectory.h"
 #include "kit/WireSupport.h"
 
 namespace cimom::test {
@@ -105,6 +106,26 @@ TEST_F(WbemInterop, QualifierTypesAreWhole) {
         "6 no qualifier \"No\"");
     EXPECT_EQ(errorOf(server.call("GetQualifier", "", "interop")),
               "4 parameter QualifierName is missing");
+}
+
+/// Of providers there, too: clients compare registered profiles.
+TEST(WbemInteropOfProviders, EnumerationsShowWhatGetInstanceShows) {
+    const ZR::Testing::TemporaryDirectory directory;
+    directory.write("/numbered.reg",
+                    "[Test_Numbered]\nprovider: Test\nlocation: TestProvider\ntype: instance\n"
+                    "namespace: root/interop root/test\n");
+    Configuration numbered = configuration("test.reg");
+    numbered.registrationFiles = {directory.path("/numbered.reg")};
+    TestServer server({}, numbered);
+    const auto propertiesIn = [&server](const std::string& nameSpace) {
+        const auto all =
+            returned(server.call("EnumerateInstances", classParameter("Test_Numbered"), nameSpace));
+        return wbem::readInstance(all.at(0).children.at(1)).properties;
+    };
+    const auto shown = propertiesIn("interop");
+    ASSERT_THAT(shown, SizeIs(2));
+    EXPECT_TRUE(findValue(shown, "Text")->isNull());
+    EXPECT_THAT(propertiesIn("root/test"), SizeIs(0));
 }
 
 class WbemQueries : public testing::Test {
