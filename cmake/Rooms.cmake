@@ -201,8 +201,8 @@ function(zr_test name)
         set_target_properties(${name} PROPERTIES EXCLUDE_FROM_ALL ON)
         return()
     endif()
-    # Twice the weight of those that mostly wait, of which so many more run at once.
-    set(properties TIMEOUT 120 PROCESSORS 2)
+    # Three times the weight of those that mostly wait, of which so many more run at once.
+    set(properties TIMEOUT 120 PROCESSORS 3)
     if(TEST_SERIAL)
         list(APPEND properties RUN_SERIAL TRUE)
     endif()
