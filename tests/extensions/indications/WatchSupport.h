@@ -15,7 +15,7 @@ namespace watching {
 
 using namespace std::chrono_literals;
 
-/// An event is told within this time of its sign; twenty times of it where other tests have
+/// An event is told within this time of its sign; nine times of it where other tests have
 /// the processors. What is late by itself waits for a look once a second, and is found out.
 constexpr auto promised = 100ms;
 constexpr int underLoad = 9;
