@@ -17,7 +17,9 @@
 #include <utility>
 #include <vector>
 
+#include "cimom/ClassRepository.h"
 #include "cimom/Interop.h"
+#include "cimom/ObjectManager.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
 #include "tklogger/TKLogger.h"
@@ -176,8 +178,13 @@ void serve(const ServeCommand& command, cimom::ObjectManager& manager, std::ostr
         constexpr std::chrono::seconds patience(5);
         std::optional<EndInTime> end;
         const cimom::wbem::ServerSettings settings = settingsOf(command);
-        cimom::serveInterop(manager,
-                            {"cimdhcp", CIMDHCP_VERSION, {communicationMechanism(settings)}});
+        if (manager.repository().find("CIM_ObjectManager") != nullptr) {
+            cimom::serveInterop(manager,
+                                {"cimdhcp", CIMDHCP_VERSION, {communicationMechanism(settings)}});
+        } else {
+            log(cimom::wbem::LogKind::notice,
+                "the schema lacks CIM_ObjectManager: clients cannot find out what is served");
+        }
         cimom::wbem::Server server(manager, settings, log);
         log(cimom::wbem::LogKind::notice, "listening on " + server.url());
         out << "Listening on " << server.url() << std::endl;
