@@ -20,6 +20,7 @@
 #include <utility>
 #include <vector>
 
+#include "cimom/ClassRepository.h"
 #include "cimom/Interop.h"
 #include "cimom/ObjectManager.h"
 #include "indications/Subscriptions.h"
@@ -224,8 +225,13 @@ void serve(const ServeCommand& command, cimom::ObjectManager& manager, std::ostr
         constexpr std::chrono::seconds patience(5);
         std::optional<EndInTime> end;
         cimom::wbem::ServerSettings settings = settingsOf(command);
-        cimom::serveInterop(manager,
-                            {"cimdhcp", CIMDHCP_VERSION, {communicationMechanism(settings)}});
+        if (manager.repository().find("CIM_ObjectManager") != nullptr) {
+            cimom::serveInterop(manager,
+                                {"cimdhcp", CIMDHCP_VERSION, {communicationMechanism(settings)}});
+        } else {
+            log(cimom::wbem::LogKind::notice,
+                "the schema lacks CIM_ObjectManager: clients cannot find out what is served");
+        }
         const auto subscriptions = subscriptionsOf(command, settings.users, manager);
         cimom::wbem::Server server(manager, std::move(settings), log);
         log(cimom::wbem::LogKind::notice, "listening on " + server.url());

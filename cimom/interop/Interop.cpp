@@ -153,6 +153,7 @@ class InteropInstances {
     [[nodiscard]] std::vector<Instance> dependencies(const std::string& className,
                                                      const std::vector<Instance>& others) const {
         std::vector<Instance> made;
+        made.reserve(others.size());
         const ObjectPath manager = managers().front().path;
         for (const Instance& other : others) {
             made.push_back(instanceOf(

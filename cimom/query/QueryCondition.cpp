@@ -121,9 +121,8 @@ std::partial_ordering orderOf(const Scalar& a, const Scalar& b) {
             } else if constexpr ((xInteger || std::is_same_v<X, double>)&&(
                                      yInteger || std::is_same_v<Y, double>)) {
                 return static_cast<double>(x) <=> static_cast<double>(y);
-            } else if constexpr (!std::is_same_v<X, Y>) {
-                return std::partial_ordering::unordered;
-            } else if constexpr (std::is_same_v<X, std::string> || std::is_same_v<X, char16_t>) {
+            } else if constexpr (std::is_same_v<X, Y> &&
+                                 (std::is_same_v<X, std::string> || std::is_same_v<X, char16_t>)) {
                 return orderOf(x <=> y);
             } else {
                 return std::partial_ordering::unordered;
@@ -202,17 +201,17 @@ Truth compared(const Operand& left, Comparator comparator, const Operand& right)
     }
     switch (comparator) {
         case Comparator::equal:
-            return truthOf(ordering == 0);
+            return truthOf(std::is_eq(ordering));
         case Comparator::unequal:
-            return truthOf(ordering != 0);
+            return truthOf(std::is_neq(ordering));
         case Comparator::less:
-            return truthOf(ordering < 0);
+            return truthOf(std::is_lt(ordering));
         case Comparator::lessOrEqual:
-            return truthOf(ordering <= 0);
+            return truthOf(std::is_lteq(ordering));
         case Comparator::greater:
-            return truthOf(ordering > 0);
+            return truthOf(std::is_gt(ordering));
         default:
-            return truthOf(ordering >= 0);
+            return truthOf(std::is_gteq(ordering));
     }
 }
 

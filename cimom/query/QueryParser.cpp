@@ -117,7 +117,7 @@ ParsedQuery QueryParser::parse() {
     if (pass("AS") || (token_.kind == QueryToken::Kind::name && !isKeyword(token_.text))) {
         alias_ = identifier("another name for the class");
     }
-    select(query, std::move(selected));
+    select(query, selected);
     if (pass("WHERE")) {
         query.condition = anyOf();
     }
@@ -129,14 +129,14 @@ ParsedQuery QueryParser::parse() {
     return query;
 }
 
-void QueryParser::select(ParsedQuery& query, std::vector<std::pair<QueryName, bool>> names) {
+void QueryParser::select(ParsedQuery& query, const std::vector<std::pair<QueryName, bool>>& names) {
     if (names.empty()) {
         return;
     }
     query.properties.emplace();
     bool all = false;
-    for (auto& [written, whole] : names) {
-        const QueryName one = resolved(std::move(written));
+    for (const auto& [written, whole] : names) {
+        const QueryName one = resolved(written);
         if (one.steps.empty()) {
             if (!whole) {
                 failQuery(0, "a class is not a property that could be selected");

@@ -56,7 +56,7 @@ class QueryParser {
     /// Drops the name of the class, or that given behind AS, from before the first dot.
     void resolve(QueryName& name) const;
     QueryName resolved(QueryName name);
-    void select(ParsedQuery& query, std::vector<std::pair<QueryName, bool>> names);
+    void select(ParsedQuery& query, const std::vector<std::pair<QueryName, bool>>& names);
 
     /// Counts the nesting of conditions.
     class Nested;
