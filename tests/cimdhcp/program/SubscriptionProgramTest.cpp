@@ -2,8 +2,11 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <chrono>
 #include <csignal>
+#include <filesystem>
 #include <optional>
+#include <thread>
 
 #include "ProgramRun.h"
 #include "ServedProgram.h"
@@ -116,6 +119,13 @@ TEST_F(ServedSubscriptions, GoOnAfterTheServerWasKilled) {
     EXPECT_THAT(sourceName(before), testing::HasSubstr("eth1"));
     EXPECT_EQ(cimom::test::numberIn(before.instance), 0);
 
+    // What was on its way when the server was killed would be sent once more.
+    const std::string queue = directory() / "state/queue-1";
+    const auto end = std::chrono::steady_clock::now() + cimom::test::longEnough;
+    while (std::filesystem::file_size(queue) > 0 && std::chrono::steady_clock::now() < end) {
+        std::this_thread::sleep_for(std::chrono::milliseconds(10));
+    }
+    EXPECT_EQ(std::filesystem::file_size(queue), 0U);
     ASSERT_EQ(::kill(server_->process(), SIGKILL), 0);
     serve();
     RemoteClient asking = client();
