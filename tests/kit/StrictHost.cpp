@@ -204,11 +204,15 @@ StrictHost::Response StrictHost::eachClass(
                                    const CMPIObjectPath*)>& call) {
     Response all;
     for (const cimom::Registration& registration : registrations_) {
+        // A path that names no namespace is let through, as all that a client sends.
         const auto& spaces = registration.nameSpaces;
-        if (!registration.instance || !repository_.isA(registration.className, path.className) ||
+        const bool elsewhere =
+            !path.nameSpace.empty() &&
             std::none_of(spaces.begin(), spaces.end(), [&path](const std::string& each) {
                 return cimom::sameName(each, path.nameSpace);
-            })) {
+            });
+        if (!registration.instance || elsewhere ||
+            !repository_.isA(registration.className, path.className)) {
             continue;
         }
         cimom::ObjectPath ofSubclass = path;

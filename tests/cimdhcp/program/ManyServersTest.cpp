@@ -24,7 +24,7 @@ class ManyServers : public test::ProgramTest {
   protected:
     /// Starts servers, in which interface "ethN" of server N alone takes its address
     /// by DHCP.
-    void serve(std::size_t count) {
+    void serve(std::size_t count, bool exactly = false) {
         for (std::size_t number = 0; number < count; ++number) {
             const std::string name = "eth" + std::to_string(number);
             const std::string file = directory() / ("tree-" + std::to_string(number));
@@ -34,9 +34,9 @@ class ManyServers : public test::ProgramTest {
                           "]}");
             servers_.push_back(std::make_unique<test::ServedProgram>(
                 program(),
-                std::vector<std::string>{"--tree", file, "--data-dir", dataDir(), "serve",
-                                         "--listen", "127.0.0.1:0", "--workers", "1",
-                                         "--io-threads", "1"},
+                std::vector<std::string>{exactly ? "--exact" : "--no-header", "--tree", file,
+                                         "--data-dir", dataDir(), "serve", "--listen",
+                                         "127.0.0.1:0", "--workers", "1", "--io-threads", "1"},
                 std::vector<std::string>{"ZR_CONFIG=" + (directory() / "platform.conf"),
                                          "ZR_LOG_SINK=none"}));
         }
@@ -56,7 +56,7 @@ class ManyServers : public test::ProgramTest {
 
 TEST_F(ManyServers, SlowAndDeadOnesDelayNoOther) {
     constexpr std::size_t alive = 45;
-    serve(alive);
+    serve(alive, true);
     std::vector<std::string> urls;
     for (const auto& server : servers_) {
         urls.push_back(server->url());
@@ -115,7 +115,7 @@ TEST_F(ManyServers, SlowAndDeadOnesDelayNoOther) {
 }
 
 TEST_F(ManyServers, TextStandsBelowTheServersNames) {
-    serve(2);
+    serve(2, true);
     const Ended ended = runAs(program(), {"--connect", servers_[0]->url(), "--connect",
                                           servers_[1]->url(), "--parallel", "1", "show"});
     const auto table = [this](const std::string& number) {
