@@ -1,6 +1,7 @@
 #include "commands/Interruption.h"
 
 #include <gtest/gtest.h>
+#include <poll.h>
 
 #include "kit/ChildProcess.h"
 
@@ -14,6 +15,14 @@ TEST(Interruption, TheFirstSignalIsAWish) {
         std::raise(signal);
         EXPECT_TRUE(interruption.wanted());
     }
+}
+
+TEST(Interruption, CanBeWaitedFor) {
+    const Interruption interruption;
+    pollfd waited{interruption.descriptor(), POLLIN, 0};
+    EXPECT_EQ(::poll(&waited, 1, 0), 0);
+    std::raise(SIGTERM);
+    EXPECT_EQ(::poll(&waited, 1, 0), 1);
 }
 
 TEST(Interruption, TheSecondSignalEndsTheProcess) {
