@@ -82,17 +82,18 @@ std::vector<Object> askOthers(const Request& request, const ServedClass& served,
     CMPIStatus status{CMPI_RC_OK, nullptr};
     const CMPIBroker* broker = request.broker;
     const CMPIObjectPath* wanted = makePath(request, served.name);
+    // Not every object manager has this function.
+    const bool names = form == Form::names && broker->bft->enumerateInstanceNames != nullptr;
     CMPIEnumeration* found =
-        form == Form::names
-            ? broker->bft->enumerateInstanceNames(broker, request.context, wanted, &status)
-            : broker->bft->enumerateInstances(broker, request.context, wanted, nullptr, &status);
+        names ? broker->bft->enumerateInstanceNames(broker, request.context, wanted, &status)
+              : broker->bft->enumerateInstances(broker, request.context, wanted, nullptr, &status);
     // Without a provider of the class there are no associations with its objects.
     while (status.rc == CMPI_RC_OK && found != nullptr && found->ft->hasNext(found, nullptr) != 0) {
         const CMPIData next = found->ft->getNext(found, &status);
         if (status.rc != CMPI_RC_OK) {
             continue;
         }
-        const CMPIInstance* instance = form == Form::names ? nullptr : next.value.inst;
+        const CMPIInstance* instance = names ? nullptr : next.value.inst;
         auto object =
             withOwnPath(request, instance == nullptr ? next.value.ref : pathOf(instance), instance);
         if (object) {

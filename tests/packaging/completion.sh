@@ -43,7 +43,7 @@ completes 'QVXZR_SAPSAPDependency' associators --assoc-class QVXZR_SAP
 completes 'eth0 eth1' rename eth
 completes '' rename eth0 of
 completes 'eth0 eth1' watch wlan0 eth
-completes '--parallel --poll' watch --p
+completes '--parallel --provider-dir --poll' watch --p
 completes '' watch --poll ''
 completes 'version' profiles --sort v
 completes '--create' rename --crea

@@ -1,5 +1,6 @@
 // A server that is to serve until it is told to end.
 #include <gtest/gtest.h>
+#include <poll.h>
 
 #include "commands/Interruption.h"
 #include "commands/Serve.h"
@@ -35,6 +36,14 @@ TEST(Interruption, TheFirstSignalIsAWish) {
         std::raise(signal);
         EXPECT_TRUE(interruption.wanted());
     }
+}
+
+TEST(Interruption, CanBeWaitedFor) {
+    const Interruption interruption;
+    pollfd waited{interruption.descriptor(), POLLIN, 0};
+    EXPECT_EQ(::poll(&waited, 1, 0), 0);
+    std::raise(SIGTERM);
+    EXPECT_EQ(::poll(&waited, 1, 0), 1);
 }
 
 TEST(Interruption, TheSecondSignalEndsTheProcess) {
