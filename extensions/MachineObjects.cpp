@@ -243,7 +243,8 @@ std::string dateTimeText(std::uint64_t seconds) {
     const auto day = std::chrono::floor<std::chrono::days>(moment);
     const std::chrono::year_month_day date(day);
     const std::chrono::hh_mm_ss time(moment - day);
-    std::array<char, sizeof("yyyymmddHHMMSS.mmmmmm+000")> text{};
+    // With room for any integers, which the compiler takes these for.
+    std::array<char, 64> text{};
     static_cast<void>(std::snprintf(
         text.data(), text.size(), "%04d%02u%02u%02d%02d%02d.000000+000",
         static_cast<int>(date.year()), static_cast<unsigned>(date.month()),

@@ -11,6 +11,10 @@
 
 namespace cimdhcp {
 
+/// Whether a text comes before another one for a person: numbers within them by
+/// their value ("eth2" before "eth10"), else byte by byte.
+[[nodiscard]] bool comesBefore(std::string_view a, std::string_view b) noexcept;
+
 /// Which of the names of columns a person means: without regard to case, and with
 /// hyphens or underscores in place of blanks. Throws Failure when it is none of them.
 [[nodiscard]] std::size_t columnNamed(const std::string& wanted,
@@ -62,9 +66,5 @@ void sortBy(const std::string& wanted, const std::vector<Column<Row>>& columns,
     std::stable_sort(rows.begin(), rows.end(),
                      [&key](const Row& a, const Row& b) { return comesBefore(key(a), key(b)); });
 }
-
-/// Whether a text comes before another one for a person: numbers within them by
-/// their value ("eth2" before "eth10"), else byte by byte.
-[[nodiscard]] bool comesBefore(std::string_view a, std::string_view b) noexcept;
 
 }  // namespace cimdhcp

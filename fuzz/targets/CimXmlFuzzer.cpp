@@ -18,7 +18,7 @@ XmlElement messageOf(const std::string& response) {
 }
 
 /// What a listener makes of the same body, and a server of it as a listener's response.
-void checkExport(const std::string& body) {
+void checkExport(std::string_view body) {
     try {
         const auto indication = cimom::wbem::indicationOf(cimom::wbem::readExportCall(body, depth));
         const std::string text = cimom::wbem::indicationText(indication, "filter");

@@ -35,6 +35,15 @@ struct Writer {
     Arguments arguments;
 
     void operator()(const cimdhcp::ShowCommand&) { arguments.emplace_back("show"); }
+    void operator()(const cimdhcp::WatchCommand& command) {
+        arguments.emplace_back("watch");
+        if (command.poll) {
+            addNumber("poll", command.poll->count());
+        }
+        addOption(arguments, "listen", command.listen);
+        addOperands(arguments, command.interfaces);
+    }
+    void operator()(const cimdhcp::ProfilesCommand&) { arguments.emplace_back("profiles"); }
     void operator()(const cimdhcp::ClassesCommand&) { arguments.emplace_back("classes"); }
     void operator()(const cimdhcp::CheckCommand&) { arguments.emplace_back("check"); }
     void operator()(const cimdhcp::RenameCommand& command) {
@@ -91,7 +100,17 @@ struct Writer {
         addOption(arguments, "tls-key", command.tlsKey);
         addOption(arguments, "users", command.users);
         addFlag(arguments, "read-only", command.readOnly);
+        addOption(arguments, "subscriptions", command.subscriptions);
+        addOption(arguments, "listener-cacert", command.delivery.caCertificates);
         addLimits(command.limits);
+        addNumber("max-filters", command.subscriptionLimits.filters);
+        addNumber("max-listeners", command.subscriptionLimits.listeners);
+        addNumber("max-subscriptions", command.subscriptionLimits.subscriptions);
+        addNumber("max-queue", command.delivery.queued);
+        addNumber("delivery-retries", command.delivery.retries);
+        addNumber("retry-interval", command.delivery.retryInterval.count());
+        addNumber("listener-timeout", command.delivery.patience.count());
+        addNumber("give-up-after", command.delivery.removalTime.count());
     }
     void operator()(const cimdhcp::UserAddCommand& command) {
         arguments.emplace_back("user");
@@ -102,10 +121,12 @@ struct Writer {
     }
 
   private:
+    template <typename Number>
+    void addNumber(const char* name, Number number) {
+        addOption(arguments, name, std::to_string(number));
+    }
     void addLimits(const cimom::wbem::Limits& limits) {
-        const auto add = [this](const char* name, auto number) {
-            addOption(arguments, name, std::to_string(number));
-        };
+        const auto add = [this](const char* name, auto number) { addNumber(name, number); };
         add("max-header-line", limits.headerLine);
         add("max-headers", limits.headers);
         add("max-body", limits.body);

@@ -61,7 +61,7 @@ std::string takeBracketed(std::string_view& rest) {
     const std::size_t zone = address.find('%');
     if (zone != std::string::npos && zone + encoded.size() < address.size() &&
         address.compare(zone, encoded.size(), encoded) == 0) {
-        address.replace(zone, encoded.size(), "%");
+        address.erase(zone + 1, encoded.size() - 1);
     }
     if (end == std::string_view::npos || !isAddress6(address)) {
         throw UrlError("there is no IPv6 address in the brackets");

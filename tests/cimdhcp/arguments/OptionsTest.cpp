@@ -57,14 +57,15 @@ TEST(OptionRules, SaysHowToWatch) {
     EXPECT_EQ(line({"profiles"}).command, Command(ProfilesCommand{}));
     for (const char* option :
          {"--poll=0", "--poll=86401", "--poll=x", "--sort=STATE", "--count", "--format=mof"}) {
-        EXPECT_NE(refusal({"watch", option}), "accepted") << option;
+        EXPECT_NE(lineRefusal({"watch", option}), "accepted") << option;
     }
     const std::string forServers =
         "--listen is for servers that tell of changes: with --connect or --hosts, and without "
         "--poll";
-    EXPECT_EQ(refusal({"watch", "--listen", "::1"}), forServers);
-    EXPECT_EQ(refusal({"--connect", "h", "watch", "--poll", "1", "--listen", "::1"}), forServers);
-    EXPECT_NE(refusal({"profiles", "--format", "mof"}), "accepted");
+    EXPECT_EQ(lineRefusal({"watch", "--listen", "::1"}), forServers);
+    EXPECT_EQ(lineRefusal({"--connect", "h", "watch", "--poll", "1", "--listen", "::1"}),
+              forServers);
+    EXPECT_NE(lineRefusal({"profiles", "--format", "mof"}), "accepted");
     EXPECT_EQ(line({"profiles", "--sort", "version"}).options.sort, "version");
 }
 

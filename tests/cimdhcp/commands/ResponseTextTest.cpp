@@ -15,18 +15,18 @@
 namespace cimdhcp {
 namespace {
 
-using Json = nlohmann::json;
+using ParsedJson = nlohmann::json;
 using cimom::Array;
 using cimom::Scalar;
 using cimom::Type;
 using cimom::Value;
 
 /// One value in its place in the response.
-Json valueIn(const Value& value) {
+ParsedJson valueIn(const Value& value) {
     cimom::Instance instance;
     instance.path.className = "TEST_Thing";
     instance.properties.push_back({"P", value});
-    const Json document = Json::parse(asJson({"GetInstance", {}, 0, {}, {instance}}));
+    const ParsedJson document = ParsedJson::parse(asJson({"GetInstance", {}, 0, {}, {instance}}));
     return document["instances"][0]["properties"]["P"];
 }
 
@@ -98,8 +98,8 @@ TEST(ResponseJson, HasInstancesWithTheirProperties) {
 
 TEST(ResponseJson, NamesTheStatus) {
     const Response response{"GetInstance", {CMPI_RC_ERR_NOT_FOUND, "words"}, 0, {}, {}};
-    EXPECT_EQ(Json::parse(asJson(response))["status"],
-              Json({{"code", 6}, {"name", "CIM_ERR_NOT_FOUND"}}));
+    EXPECT_EQ(ParsedJson::parse(asJson(response))["status"],
+              ParsedJson({{"code", 6}, {"name", "CIM_ERR_NOT_FOUND"}}));
 }
 
 TEST(ResponseJson, KeepsNumbersExactly) {
@@ -127,14 +127,14 @@ TEST(ResponseJson, WritesTheOtherTypes) {
     const auto path =
         std::make_shared<const cimom::ObjectPath>(cimom::parseObjectPath("a:TEST_Base.Id=\"x\""));
     EXPECT_EQ(valueIn({Type::reference, false, Scalar(path)}),
-              Json({{"type", "reference"}, {"value", "a:TEST_Base.Id=\"x\""}}));
+              ParsedJson({{"type", "reference"}, {"value", "a:TEST_Base.Id=\"x\""}}));
 }
 
 TEST(ResponseJson, NestsEmbeddedInstances) {
     cimom::Instance inner;
     inner.path.className = "TEST_Keyless";
     inner.properties.push_back({"Text", Value::ofString("x")});
-    const Json json =
+    const ParsedJson json =
         valueIn({Type::instance, false, Scalar(std::make_shared<const cimom::Instance>(inner))});
     EXPECT_EQ(json["value"]["class"], "TEST_Keyless");
     EXPECT_EQ(json["value"]["properties"]["Text"]["value"], "x");

@@ -17,7 +17,7 @@ namespace {
 using testing::ElementsAre;
 using testing::IsEmpty;
 
-constexpr std::int64_t now = 1'795'320'000;  // 2026-11-22T04:00:00Z
+constexpr std::int64_t present = 1'795'320'000;  // 2026-11-22T04:00:00Z
 constexpr std::int64_t hour = 3600;
 
 LeaseOverview leaseOf(const std::string& address) {
@@ -26,10 +26,10 @@ LeaseOverview leaseOf(const std::string& address) {
     lease.clientState = 8;
     lease.address = address;
     lease.server = "192.0.2.1";
-    lease.obtained = now - hour;
-    lease.renews = now + hour;
-    lease.rebinds = now + 2 * hour;
-    lease.expires = now + 3 * hour;
+    lease.obtained = present - hour;
+    lease.renews = present + hour;
+    lease.rebinds = present + 2 * hour;
+    lease.expires = present + 3 * hour;
     lease.client = "dhclient";
     return lease;
 }
@@ -67,10 +67,10 @@ InterfaceOverview off(const std::string& name) {
 using Interfaces = std::vector<InterfaceOverview>;
 
 std::vector<std::string> changes(const Interfaces& before, const Interfaces& after,
-                                 std::int64_t later = now) {
+                                 std::int64_t later = present) {
     std::vector<std::string> texts;
     for (const WatchedChange& change :
-         changesBetween(watchedStates(before, now), watchedStates(after, later))) {
+         changesBetween(watchedStates(before, present), watchedStates(after, later))) {
         texts.push_back(changeText(change, "->"));
     }
     return texts;
@@ -79,7 +79,7 @@ std::vector<std::string> changes(const Interfaces& before, const Interfaces& aft
 TEST(WatchedChanges, OfWhatIsAsItWasThereAreNone) {
     const Interfaces all{bound("eth0", "192.0.2.17"), asking("eth1"), off("eth2")};
     EXPECT_THAT(changes(all, all), IsEmpty());
-    EXPECT_THAT(changes(all, all, now + 1), IsEmpty());
+    EXPECT_THAT(changes(all, all, present + 1), IsEmpty());
 }
 
 TEST(WatchedChanges, TellTheLifeOfALease) {
@@ -94,8 +94,8 @@ TEST(WatchedChanges, TellTheLifeOfALease) {
 
 TEST(WatchedChanges, TellThatALeaseWasRenewedUntilWhen) {
     InterfaceOverview renewed = bound("eth0", "192.0.2.17");
-    renewed.leases->front().obtained = now;
-    renewed.leases->front().expires = now + 4 * hour;
+    renewed.leases->front().obtained = present;
+    renewed.leases->front().expires = present + 4 * hour;
     EXPECT_THAT(changes({bound("eth0", "192.0.2.17")}, {renewed}),
                 ElementsAre("eth0  bound 192.0.2.17, renewed until 2026-11-22T08:00:00Z"));
     renewed.leases->front().expires = static_cast<std::int64_t>(ZR::NodeLexicon::never);
@@ -111,7 +111,7 @@ TEST(WatchedChanges, TakeNoRoundedTimeForARenewal) {
     EXPECT_THAT(changes({before}, {after}), IsEmpty());
     *after.leases->front().expires += 1;
     EXPECT_EQ(changes({before}, {after}).size(), 1U);
-    after.leases->front().obtained = now;
+    after.leases->front().obtained = present;
     EXPECT_THAT(changes({before}, {after}), IsEmpty()) << "only now is it known";
 }
 
@@ -175,16 +175,16 @@ TEST(WatchedChanges, CannotSteerATerminal) {
 
 TEST(WatchedChanges, ComeWithTimeAlone) {
     const Interfaces all{bound("eth0", "192.0.2.17")};
-    EXPECT_EQ(nextStates(all, now), now + hour + 3);
-    EXPECT_THAT(changes(all, all, now + hour + 2), IsEmpty());
-    EXPECT_THAT(changes(all, all, now + hour + 3),
+    EXPECT_EQ(nextStates(all, present), present + hour + 3);
+    EXPECT_THAT(changes(all, all, present + hour + 2), IsEmpty());
+    EXPECT_THAT(changes(all, all, present + hour + 3),
                 ElementsAre("eth0  bound 192.0.2.17 -> renewing"));
-    EXPECT_THAT(changes(all, all, now + 2 * hour + 3),
+    EXPECT_THAT(changes(all, all, present + 2 * hour + 3),
                 ElementsAre("eth0  bound 192.0.2.17 -> rebinding"));
-    EXPECT_EQ(nextStates(all, now + 2 * hour + 3), now + 3 * hour);
-    EXPECT_THAT(changes(all, all, now + 3 * hour),
+    EXPECT_EQ(nextStates(all, present + 2 * hour + 3), present + 3 * hour);
+    EXPECT_THAT(changes(all, all, present + 3 * hour),
                 ElementsAre("eth0  bound 192.0.2.17 -> expired"));
-    EXPECT_EQ(nextStates(all, now + 3 * hour), std::nullopt);
+    EXPECT_EQ(nextStates(all, present + 3 * hour), std::nullopt);
 }
 
 TEST(WatchedChanges, AreFoundAmongManyInterfaces) {
@@ -212,20 +212,20 @@ struct Written {
 TEST(WatchLog, WritesTheTimeAndTheMachineBeforeEachChange) {
     Written written;
     WatchLog log({}, {"a.example", "b.example"}, {.hosts = true}, written.outputs);
-    log.saw(0, {asking("eth0")}, now);
-    log.saw(1, {off("eth0")}, now);
+    log.saw(0, {asking("eth0")}, present);
+    log.saw(1, {off("eth0")}, present);
     log.announce();
     EXPECT_EQ(written.take(), "");
     EXPECT_EQ(written.err.str(), "cimdhcp: watching 2 interfaces of 2 servers\n");
-    log.saw(1, {asking("eth0")}, now + 1);
+    log.saw(1, {asking("eth0")}, present + 1);
     EXPECT_EQ(written.take(), "2026-11-22T04:00:01Z  b.example  eth0  off -> asking\n");
 }
 
 TEST(WatchLog, WritesAnObjectALine) {
     Written written;
     WatchLog log({}, {"a.example"}, {.json = true, .hosts = true}, written.outputs);
-    log.saw(0, {}, now);
-    log.saw(0, {bound("eth0", "192.0.2.17")}, now);
+    log.saw(0, {}, present);
+    log.saw(0, {bound("eth0", "192.0.2.17")}, present);
     EXPECT_EQ(written.take(),
               R"({"time":"2026-11-22T04:00:00Z","host":"a.example","interface":"eth0",)"
               R"("system":"Computer","family":"IPv4","before":null,)"
@@ -237,23 +237,23 @@ TEST(WatchLog, WritesAnObjectALine) {
 TEST(WatchLog, KeepsToTheInterfacesThatAreNamed) {
     Written written;
     WatchLog log({"eth1", "eth9"}, {"this machine"}, {}, written.outputs);
-    log.saw(0, {off("eth0"), off("eth1")}, now);
+    log.saw(0, {off("eth0"), off("eth1")}, present);
     log.announce();
     EXPECT_EQ(written.err.str(),
               "cimdhcp: note: there is no interface \"eth9\" yet\n"
               "cimdhcp: watching 1 interface\n");
-    log.saw(0, {asking("eth0"), asking("eth1")}, now);
+    log.saw(0, {asking("eth0"), asking("eth1")}, present);
     EXPECT_EQ(written.take(), "2026-11-22T04:00:00Z  eth1  off -> asking\n");
 }
 
 TEST(WatchLog, TellsOnceThatAMachineDoesNotRespond) {
     Written written;
     WatchLog log({}, {"a.example"}, {}, written.outputs);
-    log.saw(0, {bound("eth0", "192.0.2.17")}, now);
+    log.saw(0, {bound("eth0", "192.0.2.17")}, present);
     log.failed(0, "it is asleep");
     log.failed(0, "it is asleep");
     EXPECT_TRUE(log.hasFailed(0));
-    log.saw(0, {bound("eth0", "192.0.2.18")}, now);
+    log.saw(0, {bound("eth0", "192.0.2.18")}, present);
     EXPECT_FALSE(log.hasFailed(0));
     EXPECT_EQ(written.err.str(),
               "cimdhcp: a.example: it is asleep\ncimdhcp: a.example: it responds again\n");
@@ -264,12 +264,12 @@ TEST(WatchLog, TellsOnceThatAMachineDoesNotRespond) {
 TEST(WatchLog, WritesWhatTimeAloneChangesOnce) {
     Written written;
     WatchLog log({}, {"this machine"}, {}, written.outputs);
-    EXPECT_EQ(log.nextAge(now), std::nullopt);
-    log.saw(0, {bound("eth0", "192.0.2.17")}, now);
-    ASSERT_EQ(log.nextAge(now + 2 * hour + 3), now + 3 * hour);
-    log.age(now + 3 * hour);
+    EXPECT_EQ(log.nextAge(present), std::nullopt);
+    log.saw(0, {bound("eth0", "192.0.2.17")}, present);
+    ASSERT_EQ(log.nextAge(present + 2 * hour + 3), present + 3 * hour);
+    log.age(present + 3 * hour);
     EXPECT_EQ(written.take(), "2026-11-22T07:00:00Z  eth0  bound 192.0.2.17 -> expired\n");
-    log.age(now + 3 * hour + 1);
+    log.age(present + 3 * hour + 1);
     EXPECT_EQ(written.take(), "");
 }
 
@@ -303,9 +303,9 @@ TEST(WatchName, OfThisProcessIsNotThatOfAnother) {
 TEST(WatchLog, EndsWhenNoOneTakesItsLines) {
     Written written;
     WatchLog log({}, {"this machine"}, {}, written.outputs);
-    log.saw(0, {off("eth0")}, now);
+    log.saw(0, {off("eth0")}, present);
     written.out.setstate(std::ios::badbit);
-    EXPECT_THROW(log.saw(0, {asking("eth0")}, now), Failure);
+    EXPECT_THROW(log.saw(0, {asking("eth0")}, present), Failure);
 }
 
 }  // namespace

@@ -24,7 +24,7 @@ ObjectPath made(ObjectManager& manager, const char* className, std::vector<Named
     return result.paths.empty() || !result.paths.front() ? ObjectPath() : *result.paths.front();
 }
 
-NamedValue reference(const char* name, const ObjectPath& path) {
+NamedValue endOf(const char* name, const ObjectPath& path) {
     return {name, {Type::reference, false, Scalar(std::make_shared<const ObjectPath>(path))}};
 }
 
@@ -54,7 +54,7 @@ TEST(SubscriptionsEndToEnd, AClientThatBeginsOnAnInterfaceIsToldToTheListener) {
             manager, "CIM_ListenerDestinationCIMXML",
             {{"Name", Value::ofString("test")}, {"Destination", Value::ofString(listener.url())}});
         made(manager, "CIM_IndicationSubscription",
-             {reference("Filter", filter), reference("Handler", destination)});
+             {endOf("Filter", filter), endOf("Handler", destination)});
 
         run("ip link add test0 type bridge && ip link set test0 up");
         run("udhcpc -f -i test0 -s /bin/true >/dev/null 2>&1 &");
