@@ -42,8 +42,8 @@ CMPIBoolean evaluate(const CMPISelectExp* self, const CMPIInstance* inst, CMPISt
         const SelectExpRecord* const expression = selectExpOf(self);
         const InstanceRecord* const instance = instanceOf(inst);
         if (expression == nullptr || instance == nullptr) {
-            code = expression == nullptr ? CMPI_RC_ERR_INVALID_HANDLE
-                                         : CMPI_RC_ERR_INVALID_PARAMETER;
+            code =
+                expression == nullptr ? CMPI_RC_ERR_INVALID_HANDLE : CMPI_RC_ERR_INVALID_PARAMETER;
             return 0;
         }
         try {

@@ -158,8 +158,7 @@ TEST_F(Remote, TheMachineIsShownAsItIsHere) {
         expectSame({"--format", format, "show", "--count"});
     }
     expectSame({"show", "--sort", "size"});
-    EXPECT_THAT(ask({"show", "--no-header"}).out, HasSubstr("asking  udhcpc"))
-        << ask({"show"}).out;
+    EXPECT_THAT(ask({"show", "--no-header"}).out, HasSubstr("asking  udhcpc")) << ask({"show"}).out;
 }
 
 TEST_F(Remote, WhatIsNotAsItLooksThereIsTold) {

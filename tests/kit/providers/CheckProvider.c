@@ -346,11 +346,12 @@ static void checkServices(const Call* call) {
                    CMPI_RC_ERR_NOT_SUPPORTED &&
                broker->eft->trace(broker, CMPI_LEV_INFO, "c", "text", NULL).rc ==
                    CMPI_RC_ERR_NOT_SUPPORTED);
-    report(call, "newSelectExp",
-           broker->eft->newSelectExp(broker, "SELECT * FROM x", "Latin", &projection, &rc) == NULL &&
-               rc.rc == CMPI_RC_ERR_QUERY_LANGUAGE_NOT_SUPPORTED && projection == NULL &&
-               broker->eft->newSelectExp(broker, "SELECT", "WQL", NULL, &rc) == NULL &&
-               rc.rc == CMPI_RC_ERR_INVALID_QUERY);
+    report(
+        call, "newSelectExp",
+        broker->eft->newSelectExp(broker, "SELECT * FROM x", "Latin", &projection, &rc) == NULL &&
+            rc.rc == CMPI_RC_ERR_QUERY_LANGUAGE_NOT_SUPPORTED && projection == NULL &&
+            broker->eft->newSelectExp(broker, "SELECT", "WQL", NULL, &rc) == NULL &&
+            rc.rc == CMPI_RC_ERR_INVALID_QUERY);
     CMPISelectExp* all =
         broker->eft->newSelectExp(broker, "SELECT * FROM Test_Types", "WQL", &projection, &rc);
     report(call, "selectAll",
