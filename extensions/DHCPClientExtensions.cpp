@@ -18,12 +18,12 @@ namespace ZR::DHCPClientExtensions {
 
 namespace {
 
-std::atomic<const CMPIBroker*> broker = nullptr;
+std::atomic<const CMPIBroker*> hostBroker = nullptr;
 
 const std::string loggerExtensions = "ZR.Extensions";
 
 CMPIStatus statusOf(CMPIrc code, const char* message) {
-    const CMPIBroker* host = broker;
+    const CMPIBroker* host = hostBroker;
     return {code, host->eft->newString(host, message, nullptr)};
 }
 
@@ -35,7 +35,7 @@ CMPIStatus serve(const CMPIContext* context, const CMPIResult* result, const CMP
     const OneMoment moment;
     try {
         const std::shared_ptr<const Snapshot> machine = OneMoment::current();
-        operation(Request{broker, context, result, path, ProviderUtilities::getNamespace(path),
+        operation(Request{hostBroker, context, result, path, ProviderUtilities::getNamespace(path),
                           machine.get()});
         result->ft->returnDone(result);
         return {CMPI_RC_OK, nullptr};
@@ -170,7 +170,7 @@ constexpr CMPIAssociationMIFT associationTable{
 };
 
 void prepare(const CMPIBroker* host) {
-    broker = host;
+    hostBroker = host;
     serveLiveMachine();
 }
 

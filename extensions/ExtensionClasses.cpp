@@ -28,14 +28,14 @@ constexpr std::array elementKeys{"InstanceID"};
 constexpr std::array endpointKeys{"SystemCreationClassName", "SystemName", "CreationClassName",
                                   "Name"};
 
-constexpr const char* endpoint = Classes::dhcpProtocolEndpoint.name;
+constexpr const char* endpointClass = Classes::dhcpProtocolEndpoint.name;
 
 constexpr std::array<ElementClass, 5> elements{{
     {"QVXZR_DHCPLease", elementAncestors, elementKeys, &leaseObjects},
     {"QVXZR_DHCPInterface", elementAncestors, elementKeys, &interfaceObjects},
     {"QVXZR_DHCPDiagnostic", elementAncestors, elementKeys, &diagnosticObjects},
     {profileClass, profileAncestors, elementKeys, &profileObjects},
-    {endpoint, endpointAncestors, endpointKeys, nullptr, &endpointNames},
+    {endpointClass, endpointAncestors, endpointKeys, nullptr, &endpointNames},
 }};
 
 std::vector<Link> leaseLinks(const Request& request) {
@@ -50,12 +50,12 @@ constexpr std::array<AssociationClass, 2> associations{{
     {"QVXZR_DHCPLeaseOfEndpoint",
      dependencyAncestors,
      {"Antecedent", "Dependent"},
-     {endpoint, "QVXZR_DHCPLease"},
+     {endpointClass, "QVXZR_DHCPLease"},
      &leaseLinks},
     {"QVXZR_DHCPClientConformsToProfile",
      conformsAncestors,
      {"ConformantStandard", "ManagedElement"},
-     {profileClass, endpoint},
+     {profileClass, endpointClass},
      &profileLinks},
 }};
 

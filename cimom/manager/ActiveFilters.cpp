@@ -32,14 +32,16 @@ class IndicationProvider {
     [[nodiscard]] CMPIIndicationMI* record(const std::string& nameSpace, Status& status) {
         return provider_.indication(nameSpace, status);
     }
-    [[nodiscard]] const broker::Broker* broker() { return provider_.broker(); }
+    [[nodiscard]] const broker::Broker* broker() const { return provider_.broker(); }
 
-    Provider& provider_;
     /// Held while one of its functions about filters runs.
     std::mutex mutex;
     /// The classes and namespaces of the filters that it has accepted.
     std::vector<std::pair<std::string, std::string>> accepted;
     bool enabled = false;
+
+  private:
+    Provider& provider_;
 };
 
 struct ServedIndication {

@@ -9,7 +9,7 @@ namespace ZR {
 
 namespace {
 
-std::string textOf(const CMPIString* text) {
+std::string contentOf(const CMPIString* text) {
     const char* characters = text == nullptr ? nullptr : text->ft->getCharPtr(text, nullptr);
     return characters == nullptr ? "" : characters;
 }
@@ -35,9 +35,9 @@ Keys::Keys(const CMPIObjectPath* path) {
             continue;
         }
         Key& key = keys_.emplace_back();
-        key.name = textOf(name);
+        key.name = contentOf(name);
         if (data.type == CMPI_string) {
-            key.text = textOf(data.value.string);
+            key.text = contentOf(data.value.string);
             key.isText = data.value.string != nullptr;
         } else if (data.type == CMPI_chars) {
             key.text = data.value.chars == nullptr ? "" : data.value.chars;
@@ -68,7 +68,7 @@ bool Keys::operator==(const Keys& other) const {
 }
 
 std::string classNameOf(const CMPIObjectPath* path) {
-    return path == nullptr ? "" : textOf(path->ft->getClassName(path, nullptr));
+    return path == nullptr ? "" : contentOf(path->ft->getClassName(path, nullptr));
 }
 
 bool sameObject(const CMPIObjectPath* one, const CMPIObjectPath* other) {
