@@ -27,7 +27,7 @@ struct Trouble {
     const char* what;
     const char* remedy;
 };
-constexpr std::array<Trouble, 8> troubles{{
+constexpr std::array<Trouble, 8> toldTroubles{{
     {Kind::Denied, Verdict::notable, "rights",
      "run as root, or with CAP_SYS_PTRACE and CAP_DAC_READ_SEARCH; for the service see "
      "docs/server.md"},
@@ -83,7 +83,7 @@ class MachineExamination {
         add(Verdict::bad, "lease", ended_, "has ended, and there is no other",
             "see whether the client still runs and a DHCP server responds; start the client "
             "again");
-        for (const Trouble& trouble : troubles) {
+        for (const Trouble& trouble : toldTroubles) {
             lookAt(trouble);
         }
         return std::move(findings_);

@@ -22,7 +22,7 @@ namespace {
 
 using Row = InterfaceOverview;
 
-constexpr const char* none = "-";
+constexpr const char* noCell = "-";
 constexpr const char* unknown = "?";
 
 /// The columns of what may be unknown, and their names in JSON.
@@ -30,13 +30,13 @@ struct Field {
     std::string_view heading;
     std::string_view key;
 };
-constexpr std::array<Field, 7> fields{{{"DHCP", "dhcp"},
-                                       {"STATE", "state"},
-                                       {"CLIENT", "client"},
-                                       {"ADDRESS", "address"},
-                                       {"EXPIRES", "expires"},
-                                       {"SERVERS", "servers"},
-                                       {"CONFIGURATION NAME", "configurationName"}}};
+constexpr std::array<Field, 7> jsonFields{{{"DHCP", "dhcp"},
+                                           {"STATE", "state"},
+                                           {"CLIENT", "client"},
+                                           {"ADDRESS", "address"},
+                                           {"EXPIRES", "expires"},
+                                           {"SERVERS", "servers"},
+                                           {"CONFIGURATION NAME", "configurationName"}}};
 
 std::string cell(const std::optional<std::string>& text) {
     return text ? cellOf(*text) : unknown;
@@ -99,7 +99,7 @@ std::string expiresCell(const Row& row, std::int64_t now) {
         return *end >= static_cast<std::int64_t>(ZR::NodeLexicon::never) ? "never"
                                                                          : relativeText(*end, now);
     }
-    return mayExpire(row, now) ? unknown : none;
+    return mayExpire(row, now) ? unknown : noCell;
 }
 
 std::string expiresOrder(const Row& row, std::int64_t now) {
@@ -112,9 +112,9 @@ std::vector<Field> unknownFields(const Row& row, std::int64_t now) {
     std::vector<Field> found;
     for (const Column<Row>& column : overviewColumns(now)) {
         const auto* const field =
-            std::find_if(fields.begin(), fields.end(),
+            std::find_if(jsonFields.begin(), jsonFields.end(),
                          [&column](const Field& each) { return each.heading == column.heading; });
-        if (field != fields.end() && column.cell(row) == unknown) {
+        if (field != jsonFields.end() && column.cell(row) == unknown) {
             found.push_back(*field);
         }
     }
@@ -281,7 +281,7 @@ std::string unknownText(const std::vector<InterfaceOverview>& interfaces, std::i
     // many servers are one.
     std::vector<std::string> ofServer;
     std::vector<Said> ofMachine;
-    for (const Field& field : fields) {
+    for (const Field& field : jsonFields) {
         const bool lacking = std::any_of(
             interfaces.begin(), interfaces.end(), [&field, now](const InterfaceOverview& each) {
                 const auto unknowns = unknownFields(each, now);

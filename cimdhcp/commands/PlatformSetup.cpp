@@ -39,7 +39,7 @@ constexpr const char* treeVariable = "ZR_INSTRUMENTATION_TREE";
 /// How long the service processor may take, in milliseconds: a program that ends after one
 /// request has no later one to tell of it.
 constexpr const char* waitVariable = "ZR_SERVICE_PROCESSOR_WAIT";
-constexpr const char* patience = "1000";
+constexpr const char* processorWait = "1000";
 constexpr std::size_t largestTree = std::size_t{10} << 20U;  // as large as the platform reads
 
 struct Tree {
@@ -114,7 +114,7 @@ void setUpPlatform(const Options& options, std::ostream& err) {
     handOverTree(options.tree);
     setVariable("ZR_DATA_DIR", options.dataDir);
     if (std::getenv(waitVariable) == nullptr) {
-        setVariable(waitVariable, patience);
+        setVariable(waitVariable, processorWait);
     }
     const ZR::PlatformSettings& settings = ZR::PlatformSettings::process();
     for (const std::string& diagnostic : settings.diagnostics) {

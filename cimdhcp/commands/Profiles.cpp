@@ -72,7 +72,7 @@ std::string interopNamespace(Client& client) {
             throw client.failure(response, path);
         }
         for (const auto& each : response.paths) {
-            const std::string told = each ? heldText(each->key("Name")) : "";
+            std::string told = each ? heldText(each->key("Name")) : "";
             if (cimom::sameName(told, name)) {
                 return told;
             }

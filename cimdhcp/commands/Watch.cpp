@@ -134,6 +134,7 @@ void askAll(const std::vector<ServerUrl>& servers, const Machines& machines, std
             const std::function<void(std::size_t, const Failure&)>& failed) {
     std::vector<ServerUrl> asked;
     const std::vector<std::size_t> places(machines.begin(), machines.end());
+    asked.reserve(places.size());
     for (const std::size_t machine : places) {
         asked.push_back(servers[machine]);
     }

@@ -287,8 +287,8 @@ void WatchSubscriptions::subscribe(std::size_t server, const ServerUrl& url, Rem
     removeAll(client, interop,
               [this](const std::string& name) { return name_.mayRemove(name, runs); });
     set(server, State::begun);
-    const auto named = [this](const char* className, const char* what) {
-        return std::vector<NamedValue>{text("CreationClassName", className),
+    const auto named = [this](const char* ofClass, const char* what) {
+        return std::vector<NamedValue>{text("CreationClassName", ofClass),
                                        text("SystemCreationClassName", "CIM_ComputerSystem"),
                                        text("Name", name_.text() + what)};
     };

@@ -27,11 +27,11 @@ class WatchName {
 
     [[nodiscard]] const std::string& text() const noexcept { return text_; }
     /// Whether the name of a filter or destination begins with that of a process of the same
-    /// user and host that runs no more, or with this one. `runs` tells whether a process that
+    /// user and host that runs no more, or with this one. `isRunning` tells whether a process that
     /// started at that moment (clock ticks since the boot) is there.
     [[nodiscard]] bool mayRemove(
         std::string_view name,
-        const std::function<bool(std::uint64_t process, std::uint64_t start)>& runs) const;
+        const std::function<bool(std::uint64_t process, std::uint64_t start)>& isRunning) const;
 
   private:
     std::string prefix_;

@@ -30,7 +30,7 @@ constexpr const char* serviceName = "indications";
 /// Of names and URLs, in bytes.
 constexpr std::size_t longestText = 2048;
 constexpr std::size_t mostNameSpaces = 32;
-constexpr std::int64_t microseconds = 1000000;
+constexpr std::int64_t inSecond = 1000000;  // microseconds
 
 [[noreturn]] void refuseRequest(CMPIrc code, const std::string& reason) {
     throw RequestRefused(code, reason);
@@ -337,7 +337,7 @@ class SubscribedClass final : public SubscriptionClass {
             add("RepeatNotificationPolicy", ofUnsigned(Type::uint16, noRepetition));
             if (record.duration) {
                 const auto passed = static_cast<std::uint64_t>(
-                    std::max<Moment>(moment - record.started, 0) / microseconds);
+                    std::max<Moment>(moment - record.started, 0) / inSecond);
                 add("SubscriptionDuration", ofUnsigned(Type::uint64, *record.duration));
                 add("SubscriptionTimeRemaining",
                     ofUnsigned(Type::uint64,

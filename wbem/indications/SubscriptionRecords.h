@@ -67,7 +67,7 @@ struct SubscriptionRecords {
 [[nodiscard]] std::string toJson(const SubscriptionRecords& records);
 /// Throws std::runtime_error for a text that is not such records, and for records that do
 /// not fit each other.
-[[nodiscard]] SubscriptionRecords subscriptionRecords(std::string_view json);
+[[nodiscard]] SubscriptionRecords subscriptionRecords(std::string_view text);
 
 /// Replaces the file at once, so that it is never seen half written. Throws
 /// std::system_error.

@@ -77,11 +77,9 @@ void judgeHead(MHD_Connection* connection, std::string_view method, Incoming& in
     }
 }
 
-MHD_Result sendTo(MHD_Connection* connection, const Response& response) {
+MHD_Result sendTo(MHD_Connection* connection, Response response) {
     MHD_Response* const made = MHD_create_response_from_buffer(
-        response.body.size(),
-        // The library copies, and its type is not constant for those who do not want that.
-        const_cast<char*>(response.body.data()), MHD_RESPMEM_MUST_COPY);
+        response.body.size(), response.body.data(), MHD_RESPMEM_MUST_COPY);
     if (made == nullptr) {
         return MHD_NO;
     }
