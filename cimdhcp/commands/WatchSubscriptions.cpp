@@ -143,9 +143,9 @@ Instance instanceOf(const std::string& nameSpace, const char* className,
     return {{"", nameSpace, className, {}}, std::move(properties)};
 }
 
-/// Creates it; its path as the server has it.
-ObjectPath create(RemoteClient& client, const Instance& instance) {
-    const Response response = client.createInstance(instance);
+/// The path of what was created, as the server has it.
+ObjectPath createdPath(const RemoteClient& client, const Instance& instance,
+                       const Response& response) {
     if (!response.status.ok()) {
         throw Failure(ExitStatus::notDone,
                       "it takes no subscription (" +
@@ -158,6 +158,30 @@ ObjectPath create(RemoteClient& client, const Instance& instance) {
     ObjectPath path = *response.paths.front();
     path.nameSpace = instance.path.nameSpace;
     return path;
+}
+
+ObjectPath create(RemoteClient& client, const Instance& instance) {
+    return createdPath(client, instance, client.createInstance(instance));
+}
+
+/// Creates a filter for indications of a class: of what is watched alone, where the server
+/// has a language that can say so, else of everything. More than is watched does no harm.
+ObjectPath createFilter(RemoteClient& client, const Instance& filter, const char* indicationClass) {
+    const std::string query = std::string("SELECT * FROM ") + indicationClass;
+    const auto asking = [&filter](const std::string& words, const char* language) {
+        Instance instance = filter;
+        instance.properties.push_back(text("Query", words));
+        instance.properties.push_back(text("QueryLanguage", language));
+        return instance;
+    };
+    const Instance exact = asking(query + condition(), "DMTF:CQL");
+    const Response response = client.createInstance(exact);
+    const unsigned code = response.status.code;
+    if (code == CMPI_RC_ERR_NOT_SUPPORTED || code == CMPI_RC_ERR_QUERY_LANGUAGE_NOT_SUPPORTED ||
+        code == CMPI_RC_ERR_INVALID_QUERY) {
+        return create(client, asking(query, "WQL"));
+    }
+    return createdPath(client, exact, response);
 }
 
 std::string nameIn(const Value* value) {
@@ -302,10 +326,8 @@ void WatchSubscriptions::subscribe(std::size_t server, const ServerUrl& url, Rem
         properties.push_back(
             {"SourceNamespaces",
              {cimom::Type::string, true, cimom::Array{cimom::Scalar(client.nameSpace())}}});
-        properties.push_back(text("Query", "SELECT * FROM " + (className + condition())));
-        properties.push_back(text("QueryLanguage", "DMTF:CQL"));
-        const ObjectPath filter =
-            create(client, instanceOf(interop, filterClass, std::move(properties)));
+        const ObjectPath filter = createFilter(
+            client, instanceOf(interop, filterClass, std::move(properties)), className);
         create(client, instanceOf(interop, subscriptionClass,
                                   {reference("Filter", filter), reference("Handler", listener),
                                    number("OnFatalErrorPolicy", 4)}));  // remove

@@ -130,7 +130,7 @@ Status callSlot(const IndicationProvider& provider, CMPIIndicationMI* mi, Slot s
                                                            broker::RequestScope::depthOfThread());
     const CMPIObjectPath* const record =
         broker::makePath(arena, &classes, path.nameSpace, path.className);
-    const std::string who = "provider " + provider.provider_.name() + ": " + name;
+    const std::string who = "provider " + provider.provider().name() + ": " + name;
     Status status =
         guardedCall(who, [&] { return std::forward<Invoke>(invoke)(slot, mi, context, record); });
     if (!status.ok() && status.message.empty()) {
@@ -144,7 +144,7 @@ Status callSlot(const IndicationProvider& provider, CMPIIndicationMI* mi, Slot s
 void ActiveFilters::Core::serve(const ClassDeclaration& declaration, Provider& provider,
                                 const std::vector<std::string>& nameSpaces) {
     const auto known = std::ranges::find_if(
-        providers_, [&](const auto& one) { return &one->provider_ == &provider; });
+        providers_, [&](const auto& one) { return &one->provider() == &provider; });
     IndicationProvider& serving =
         known != providers_.end()
             ? **known
