@@ -19,7 +19,7 @@ _cimdhcp() {
                 asked+=("${COMP_WORDS[index]}" "${COMP_WORDS[index + 1]}")
                 ((++index))
                 ;;
-            --tree | --data-dir | --namespace | --format | --hosts | --parallel | --timeout | --sort | --color | --*-dir | --*-class | --role | --result-role | --listen | --tls-* | --users | --max-* | --workers | --io-threads | --*-timeout | --poll)
+            --tree | --data-dir | --namespace | --format | --hosts | --parallel | --timeout | --sort | --color | --*-dir | --*-class | --role | --result-role | --listen | --tls-* | --users | --max-* | --workers | --io-threads | --*-timeout | --poll | --subscriptions | --listener-cacert | --delivery-retries | --retry-interval | --give-up-after)
                 ((++index))
                 ;;
             -*) ;;
@@ -33,7 +33,9 @@ _cimdhcp() {
         esac
     done
     # A server that is slow must not make the shell wait.
-    [[ ${asked[*]} == *--connect* ]] && asked+=(--timeout 2)
+    if [[ ${asked[*]} == *--connect* ]]; then
+        asked+=(--timeout 2)
+    fi
 
     case $before in
         --format)
@@ -72,14 +74,14 @@ _cimdhcp() {
             mapfile -t COMPREPLY < <(compgen -o plusdirs -f -X '!*.mof' -- "$word")
             return
             ;;
-        --data-dir | --schema-dir | --registration-dir | --provider-dir)
+        --data-dir | --schema-dir | --registration-dir | --provider-dir | --subscriptions)
             mapfile -t COMPREPLY < <(compgen -d -- "$word")
             return
             ;;
         --assoc-class | --result-class)
             command=names position=0
             ;;
-        --namespace | --role | --result-role | --parallel | --timeout | --listen | --max-* | --workers | --io-threads | --*-timeout | --poll)
+        --namespace | --role | --result-role | --parallel | --timeout | --listen | --max-* | --workers | --io-threads | --*-timeout | --poll | --delivery-retries | --retry-interval | --give-up-after)
             return
             ;;
     esac

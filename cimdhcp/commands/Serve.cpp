@@ -232,7 +232,13 @@ void serve(const ServeCommand& command, cimom::ObjectManager& manager, std::ostr
             log(cimom::wbem::LogKind::notice,
                 "the schema lacks CIM_ObjectManager: clients cannot find out what is served");
         }
-        const auto subscriptions = subscriptionsOf(command, settings.users, manager);
+        std::unique_ptr<cimom::wbem::Subscriptions> subscriptions;
+        if (manager.repository().find("CIM_IndicationFilter") != nullptr) {
+            subscriptions = subscriptionsOf(command, settings.users, manager);
+        } else {
+            log(cimom::wbem::LogKind::notice,
+                "the schema lacks CIM_IndicationFilter: clients cannot subscribe");
+        }
         cimom::wbem::Server server(manager, std::move(settings), log);
         log(cimom::wbem::LogKind::notice, "listening on " + server.url());
         out << "Listening on " << server.url() << std::endl;

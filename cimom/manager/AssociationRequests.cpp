@@ -27,6 +27,35 @@ const ObjectPath& pathOf(const Instance& instance) noexcept {
     return instance.path;
 }
 
+/// Passes a result on, and knows whether there is anything in it that counts.
+template <typename Object>
+class CountedResult final : public ResultReceiver<Object> {
+  public:
+    explicit CountedResult(ResultReceiver<Object>& client) noexcept : client_(client) {}
+
+    void beginCall() override {
+        ofCall_ = 0;
+        client_.beginCall();
+    }
+    void take(std::optional<Object> object) override {
+        ++ofCall_;
+        ++count_;
+        client_.take(std::move(object));
+    }
+    void dropCall() override {
+        count_ -= ofCall_;
+        ofCall_ = 0;
+        client_.dropCall();
+    }
+
+    [[nodiscard]] bool empty() const noexcept { return count_ == 0; }
+
+  private:
+    ResultReceiver<Object>& client_;
+    std::size_t ofCall_ = 0;
+    std::size_t count_ = 0;
+};
+
 /// The classes of each provider, in the order of the first, without own ones.
 std::vector<std::pair<Provider*, std::vector<const ServedClass*>>> byProvider(
     const std::vector<const ServedClass*>& classes) {
@@ -178,6 +207,7 @@ RequestEnd ObjectManager::Implementation::associated(ObjectPath path,
                                                      const AssociationRequest& request,
                                                      ResultReceiver<Object>& receiver) {
     return run(path, [&]() -> RequestEnd {
+        CountedResult<Object> counted(receiver);
         if (Status status = checkClasses(request, repository_); !status.ok()) {
             return {std::move(status)};
         }
@@ -213,7 +243,7 @@ RequestEnd ObjectManager::Implementation::associated(ObjectPath path,
                 return noted(*asked, path, callAssociators(*asked, path, passed, &requested));
             };
             if (!request.role && !request.resultRole) {
-                calls.push_back(ask(receiver));
+                calls.push_back(ask(counted));
                 continue;
             }
             CollectedObjects<Object> collection;
@@ -232,21 +262,21 @@ RequestEnd ObjectManager::Implementation::associated(ObjectPath path,
             if (!call.status.ok()) {
                 continue;
             }
-            receiver.beginCall();
+            counted.beginCall();
             for (auto& object : collection.objects) {
                 if (!object || !known ||
                     connects(*known, path, pathOf(*object), request.role, request.resultRole,
                              repository_)) {
-                    receiver.take(std::move(object));
+                    counted.take(std::move(object));
                 }
             }
         }
         for (const ServedClass* const one : associations.classes) {
             if (one->own != nullptr) {
-                calls.push_back(associatedByOwn(*one, path, request, receiver));
+                calls.push_back(associatedByOwn(*one, path, request, counted));
             }
         }
-        return endOfAssociations(calls, associations.exact);
+        return endOfAssociations(calls, associations.exact, counted.empty());
     });
 }
 
@@ -288,6 +318,7 @@ RequestEnd ObjectManager::Implementation::referring(ObjectPath path,
                                                     const AssociationRequest& request,
                                                     ResultReceiver<Object>& receiver) {
     return run(path, [&]() -> RequestEnd {
+        CountedResult<Object> counted(receiver);
         if (Status status = checkClasses(request, repository_); !status.ok()) {
             return {std::move(status)};
         }
@@ -295,7 +326,7 @@ RequestEnd ObjectManager::Implementation::referring(ObjectPath path,
             return isOfClass(pathOf(object).className, request.resultClass, repository_) &&
                    playsRole(asInstance(object), path, request.role, repository_);
         };
-        RequestedObjects<Object> requested(receiver, surroundings(path), request.propertyList,
+        RequestedObjects<Object> requested(counted, surroundings(path), request.propertyList,
                                            isWanted);
         const Associations associations = associationsOf(path, request.resultClass, request);
         std::vector<CallOutcome> calls;
@@ -317,7 +348,7 @@ RequestEnd ObjectManager::Implementation::referring(ObjectPath path,
                 *one->provider, path,
                 callReferences(*one->provider, path, one->declaration->name, request, &requested)));
         }
-        return endOfAssociations(calls, associations.exact);
+        return endOfAssociations(calls, associations.exact, counted.empty());
     });
 }
 

@@ -51,15 +51,16 @@ RequestEnd endOf(const std::vector<CallOutcome>& calls, bool exact) {
     return {overall(calls, exact), returnDoneCallsOf(calls)};
 }
 
-RequestEnd endOfAssociations(const std::vector<CallOutcome>& calls, bool exact) {
+RequestEnd endOfAssociations(const std::vector<CallOutcome>& calls, bool exact, bool empty) {
     RequestEnd end{{}, returnDoneCallsOf(calls)};
-    if (std::ranges::none_of(calls, [](const CallOutcome& call) { return call.status.ok(); })) {
-        const auto told = std::ranges::find_if(calls, [exact](const CallOutcome& call) {
-            return exact || call.status.code != CMPI_RC_ERR_INVALID_CLASS;
-        });
-        if (told != calls.end()) {
-            end.status = told->status;
-        }
+    const bool failed =
+        std::ranges::none_of(calls, [](const CallOutcome& call) { return call.status.ok(); });
+    const auto told = std::ranges::find_if(calls, [&](const CallOutcome& call) {
+        return failed ? exact || call.status.code != CMPI_RC_ERR_INVALID_CLASS
+                      : empty && call.status.code == CMPI_RC_ERR_NOT_FOUND;
+    });
+    if (told != calls.end()) {
+        end.status = told->status;
     }
     return end;
 }

@@ -59,8 +59,10 @@ struct CallOutcome {
 /// The end of a request about associations. What one provider responds does not depend on
 /// another, so the whole fails only when every call does, with the first error. A provider
 /// that does not know the class which it was asked for has nothing to add: no error, unless
-/// the client named that class.
-[[nodiscard]] RequestEnd endOfAssociations(const std::vector<CallOutcome>& calls, bool exact);
+/// the client named that class. Where the whole result is `empty`, a provider that does not
+/// find the source is believed: others may not know what they were asked about.
+[[nodiscard]] RequestEnd endOfAssociations(const std::vector<CallOutcome>& calls, bool exact,
+                                           bool empty);
 
 // The receiver as the calls of a provider need it.
 void beginCall(const broker::AnyReceiver& receiver);

@@ -364,13 +364,13 @@ static void checkServices(const Call* call) {
                isText(projection->ft->getElementAt(projection, 1, NULL).value.string, "Note"));
     CMPIObjectPath* types = broker->eft->newObjectPath(broker, "root/test", "Test_Types", NULL);
     CMPIInstance* one = broker->eft->newInstance(broker, types, NULL);
-    one->ft->setProperty(one, "Id", (CMPIValue*)"one", CMPI_chars);
+    one->ft->setProperty(one, "Id", at("one"), CMPI_chars);
     CMPISelectExp* copy = some->ft->clone(some, &rc);
     report(call, "evaluate",
            isOk(rc) && copy->ft->evaluate(copy, one, &rc) && isOk(rc) &&
                all->ft->evaluate(all, one, NULL) && !some->ft->evaluate(some, NULL, &rc) &&
                rc.rc == CMPI_RC_ERR_INVALID_PARAMETER && isOk(copy->ft->release(copy)));
-    one->ft->setProperty(one, "Id", (CMPIValue*)"two", CMPI_chars);
+    one->ft->setProperty(one, "Id", at("two"), CMPI_chars);
     report(call, "evaluateOther", !some->ft->evaluate(some, one, &rc) && isOk(rc));
     report(call, "normalForms",
            some->ft->getDOC(some, &rc) == NULL && rc.rc == CMPI_RC_ERR_NOT_SUPPORTED &&
