@@ -246,7 +246,9 @@ class Examination {
                              ? ""
                              : ": " + printable(response.status.message)),
                     registration.className, failed);
-            } else if (response.instances.empty()) {
+            } else if (response.instances.empty() &&
+                       // Best when there is none.
+                       registration.className != "QVXZR_DHCPDiagnostic") {
                 say("no instance", registration.className, empty);
             } else {
                 add(Verdict::good, registration.className,

@@ -2,6 +2,7 @@
 #include "arguments/CommandLine.h"
 
 #include <algorithm>
+#include <chrono>
 
 #include "Input.h"
 #include "commands/Serve.h"
@@ -108,9 +109,9 @@ struct Writer {
         addNumber("max-subscriptions", command.subscriptionLimits.subscriptions);
         addNumber("max-queue", command.delivery.queued);
         addNumber("delivery-retries", command.delivery.retries);
-        addNumber("retry-interval", command.delivery.retryInterval.count());
-        addNumber("listener-timeout", command.delivery.patience.count());
-        addNumber("give-up-after", command.delivery.removalTime.count());
+        addSeconds("retry-interval", command.delivery.retryInterval);
+        addSeconds("listener-timeout", command.delivery.patience);
+        addSeconds("give-up-after", command.delivery.removalTime);
     }
     void operator()(const cimdhcp::UserAddCommand& command) {
         arguments.emplace_back("user");
@@ -124,6 +125,9 @@ struct Writer {
     template <typename Number>
     void addNumber(const char* name, Number number) {
         addOption(arguments, name, std::to_string(number));
+    }
+    void addSeconds(const char* name, std::chrono::milliseconds time) {
+        addNumber(name, std::chrono::duration_cast<std::chrono::seconds>(time).count());
     }
     void addLimits(const cimom::wbem::Limits& limits) {
         const auto add = [this](const char* name, auto number) { addNumber(name, number); };

@@ -5,6 +5,7 @@
 #include <fcntl.h>
 #include <linux/netlink.h>
 #include <poll.h>
+#include <sys/epoll.h>
 #include <sys/inotify.h>
 #include <sys/ioctl.h>
 #include <sys/stat.h>
@@ -23,7 +24,8 @@ thread_local SystemCalls* current = nullptr;
 
 constexpr std::array<const char*, static_cast<std::size_t>(Call::count)> names{
     "access",        "bind",
-    "close",         "fallocate",
+    "close",         "epoll_ctl",
+    "fallocate",     "fcntl",
     "fstat",         "fstatat",
     "ftruncate",     "gethostname",
     "getsockname",   "inotify_add_watch",
@@ -183,6 +185,16 @@ ZR_REPLACES int bind(int fd, const sockaddr* address, socklen_t size) noexcept {
 }
 ZR_REPLACES int close(int fd) {
     return complete(Call::close, ZR_CALLER, kernel(SYS_close, fd));
+}
+ZR_REPLACES int epoll_ctl(int set, int operation, int fd, epoll_event* event) noexcept {
+    return meet(Call::epoll_ctl, ZR_CALLER, -1, kernel(SYS_epoll_ctl, set, operation, fd, event));
+}
+ZR_REPLACES int fcntl(int fd, int command, ...) {
+    va_list arguments;
+    va_start(arguments, command);
+    const long argument = va_arg(arguments, long);
+    va_end(arguments);
+    return meet(Call::fcntl, ZR_CALLER, -1, kernel(SYS_fcntl, fd, command, argument));
 }
 ZR_REPLACES int fallocate(int fd, int mode, off_t offset, off_t size) {
     return meet(Call::fallocate, ZR_CALLER, -1, kernel(SYS_fallocate, fd, mode, offset, size));

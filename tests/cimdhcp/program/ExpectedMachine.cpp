@@ -51,6 +51,7 @@ constexpr const char* endpoint = "QVXZR_DHCPProtocolEndpoint";
 constexpr const char* capabilities = "QVXZR_DHCPCapabilities";
 constexpr const char* server = "QVXZR_DHCPRemoteServiceAccessPoint";
 constexpr const char* setting = "QVXZR_DHCPSettingData";
+constexpr const char* conforms = "QVXZR_DHCPClientConformsToProfile";
 constexpr const char* serverOfElement = "QVXZR_DHCPRemoteAccessAvailableToElement";
 
 }  // namespace
@@ -126,7 +127,8 @@ const std::vector<std::string>& ExpectedMachine::associationClasses() {
                                               "QVXZR_SAPSAPDependency",
                                               serverOfElement,
                                               "QVXZR_DHCPOrderedComponent",
-                                              "QVXZR_DHCPElementSettingData"};
+                                              "QVXZR_DHCPElementSettingData",
+                                              conforms};
     return all;
 }
 
@@ -140,8 +142,21 @@ ExpectedMachine::ExpectedMachine(const ExpectedClasses& classes, const std::stri
     add(system, keys,
         keys + ',' + key("ElementName", host) + R"(,NameFormat="Other",Dedicated=0)" +
             unknownStates);
+    // In another namespace than everything else.
+    const std::string profileKeys = key("InstanceID", "QVXZR:DHCP Client");
+    const Object profile{"QVXZR_RegisteredDHCPClientProfile",
+                         "QVXZR_RegisteredDHCPClientProfile." + profileKeys,
+                         profileKeys + R"(,ElementName="DHCP Client Profile",SpecificationType=2,)"
+                                       R"(RegisteredOrganization=2,RegisteredName="DHCP Client",)"
+                                       R"(RegisteredVersion="1.0.4",AdvertiseTypes=2)",
+                         "root/interop"};
+    byPath_[profile.path] = profile;
     for (const Interface& interface : interfaces) {
         addInterface(interface);
+        const Object& client = objects_[endpoint].back();
+        const std::string ends = "ConformantStandard=root/interop:" + profile.path +
+                                 ",ManagedElement=root/cimv2:" + client.path;
+        add(conforms, ends, ends, profile.path, client.path);
     }
 }
 
@@ -290,7 +305,8 @@ std::vector<ExpectedMachine::Object> ExpectedMachine::references(
                                                    "QVXZR_DHCPElementCapabilities",
                                                    serverOfElement,
                                                    "QVXZR_DHCPElementSettingData",
-                                                   "QVXZR_DHCPOrderedComponent"};
+                                                   "QVXZR_DHCPOrderedComponent",
+                                                   conforms};
     std::vector<Object> all;
     for (const std::string& each :
          associationClass.empty() ? inSchema : classes_.treeOf(associationClass)) {

@@ -44,6 +44,7 @@ class ExpectedMachine {
         std::string className;
         std::string path;        ///< "CLASS.KEY=VALUE,..."
         std::string properties;  ///< "NAME=VALUE,..." of those with a value
+        std::string nameSpace = "root/cimv2";
     };
 
     /// `host`: the name of the machine. Without interfaces, there is no system either.

@@ -67,7 +67,7 @@ class Wbemcli : public test::ProgramTest {
     static Ended lines(const std::string& host, const Objects& objects, bool properties) {
         std::string text;
         for (const auto& object : objects) {
-            text += host + "/root/cimv2:" + object.path +
+            text += host + '/' + object.nameSpace + ':' + object.path +
                     (properties ? ' ' + object.properties : "") + '\n';
         }
         return {0, text, ""};

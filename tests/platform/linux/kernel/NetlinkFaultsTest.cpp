@@ -509,6 +509,34 @@ TEST(NetlinkFaults, ARequestThatCannotBeSentIsNamed) {
     });
 }
 
+TEST(NetlinkFaults, SignsThatCannotBeHeardAreLookedForOnceASecond) {
+    ZR_NEEDS_NAMESPACES();
+    EXPECT_TRUE(passesInNamespaces(60, [] {
+        struct Fault {
+            Call call;
+            unsigned number;
+        };
+        for (const Fault fault :
+             {Fault{Call::epoll_ctl, 1}, {Call::epoll_ctl, 2}, {Call::fcntl, 1}}) {
+            Surroundings surroundings;
+            surroundings.report = [](std::string_view /*text*/) {};
+            LiveMachine machine(std::move(surroundings));
+            static_cast<void>(machine.read());
+            EXPECT_FALSE(machine.changed());
+            SystemCalls calls;
+            calls.fail(fault.call, fault.number, ENOMEM);
+            const auto before = std::chrono::steady_clock::now();
+            const ChangeSigns signs = machine.signs();
+            EXPECT_TRUE(calls.failed());
+            EXPECT_EQ(machine.changed(), fault.call == Call::epoll_ctl)
+                << "what is not heard may have changed";
+            EXPECT_EQ(static_cast<bool>(signs.descriptor), fault.call == Call::epoll_ctl);
+            ASSERT_TRUE(signs.askAt.has_value());
+            EXPECT_LE(*signs.askAt, before + std::chrono::seconds(10));
+        }
+    }));
+}
+
 TEST(NetlinkFaults, AFailingSubscriptionIsNoReasonToTrustWhatIsKnown) {
     withKernel([](Kernel& kernel) {
         kernel.expectRight(*kernel.read([](SystemCalls&) {}));
