@@ -176,8 +176,9 @@ endfunction()
 
 # zr_test(NAME SOURCES file... [LINKS target...] [LABELS label...] [ENVIRONMENT NAME=value...]
 #         [COST seconds] [SERIAL] [ONE_THREAD])
-# One test program; each of its tests is a test of its own to ctest. COST: what its longest
-# takes, so that a machine with several processors begins with it. SERIAL: no other test
+# One test program; each of its tests is a test of its own to ctest, under sanitizers only
+# where COST is given. COST: what its longest takes, so that a machine with several
+# processors begins with it. SERIAL: no other test
 # runs meanwhile. ONE_THREAD: nothing in it is used by two threads at once, so that the
 # thread sanitizer has nothing to find.
 function(zr_test name)
@@ -202,7 +203,7 @@ function(zr_test name)
         return()
     endif()
     # Three times the weight of those that mostly wait, of which so many more run at once.
-    set(properties TIMEOUT 120 PROCESSORS 3)
+    set(properties PROCESSORS 3)
     if(TEST_SERIAL)
         list(APPEND properties RUN_SERIAL TRUE)
     endif()
@@ -215,6 +216,13 @@ function(zr_test name)
     if(TEST_ENVIRONMENT)
         list(APPEND properties ENVIRONMENT "${TEST_ENVIRONMENT}")
     endif()
-    gtest_discover_tests(${name} DISCOVERY_MODE PRE_TEST PROPERTIES ${properties})
+    # Where everything is checked, starting a program takes longer than most of its tests:
+    # there, those of a program are one test unless they are long.
+    if(ZR_SANITIZERS AND NOT TEST_COST)
+        add_test(NAME ${name} COMMAND ${name} --gtest_brief=1)
+        set_tests_properties(${name} PROPERTIES ${properties} TIMEOUT 600)
+    else()
+        gtest_discover_tests(${name} DISCOVERY_MODE PRE_TEST PROPERTIES ${properties} TIMEOUT 120)
+    endif()
 endfunction()
 include(GoogleTest)

@@ -233,8 +233,8 @@ TEST_F(OverviewCommands, ShowSaysThatAMachineIsEmpty) {
 }
 
 TEST_F(OverviewCommands, WhatIsNotServedIsNotKnown) {
-    const auto registered = [this](const std::string& name, const std::string& provider,
-                                   const std::string& library) {
+    const auto registered = [](const std::string& name, const std::string& provider,
+                               const std::string& library) {
         return '[' + name + "]\nprovider: " + provider + "\nlocation: " + library +
                "\ntype: instance\nnamespace: root/cimv2\n";
     };
