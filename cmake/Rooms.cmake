@@ -174,7 +174,7 @@ function(zr_test_headers)
         <gmock/gmock.h> <gtest/gtest.h> ${PROJECT_SOURCE_DIR}/tests/kit/Printers.h)
 endfunction()
 
-# zr_test(NAME SOURCES file... [LINKS target...] [LABELS label...] [ENVIRONMENT NAME=value...]
+# zr_test(NAME SOURCES file... [LINKS target...] [LABELS label...] [ENVIRONMENT NAME=value]
 #         [COST seconds] [SERIAL] [ONE_THREAD])
 # One test program; each of its tests is a test of its own to ctest, under sanitizers only
 # where COST is given. COST: what its longest takes, so that a machine with several
