@@ -43,7 +43,7 @@ test::Json lease(const std::string& address, std::int64_t expires = 4102444800,
 
 test::Json leased(const std::string& name, const test::Json& its) {
     test::Json node = test::dhcpInterface(name, {"192.0.2.1"});
-    node["children"] = {its};
+    node["children"] = test::Json::array({its});
     return node;
 }
 
