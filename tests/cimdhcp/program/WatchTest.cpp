@@ -57,6 +57,8 @@ class Watch : public test::ProgramTest {
                     sleep 0.05
                 done
             }
+            # The shell may look into them before its child has opened them.
+            : >"$work/watched" >"$work/told"
             "$@" >"$work/watched" 2>"$work/told" &
             pid=$!
             await watching "$work/told"
