@@ -176,8 +176,8 @@ endfunction()
 
 # zr_test(NAME SOURCES file... [LINKS target...] [LABELS label...] [ENVIRONMENT NAME=value]
 #         [COST seconds] [SERIAL] [ONE_THREAD])
-# One test program; each of its tests is a test of its own to ctest, under sanitizers only
-# where COST is given. COST: what its longest takes, so that a machine with several
+# One test program; each of its tests is a test of its own to ctest, under the thread
+# sanitizer only where COST is given. COST: what its longest takes, so that a machine with several
 # processors begins with it. SERIAL: no other test
 # runs meanwhile. ONE_THREAD: nothing in it is used by two threads at once, so that the
 # thread sanitizer has nothing to find.
@@ -216,9 +216,10 @@ function(zr_test name)
     if(TEST_ENVIRONMENT)
         list(APPEND properties ENVIRONMENT "${TEST_ENVIRONMENT}")
     endif()
-    # Where everything is checked, starting a program takes longer than most of its tests:
-    # there, those of a program are one test unless they are long.
-    if(ZR_SANITIZERS AND NOT TEST_COST)
+    # Under the thread sanitizer, starting a program takes longer than most of its tests:
+    # there, those of a program are one test unless they are long. The address sanitizer looks
+    # for leaks at each end, and one test leaves it fewer threads that are just ending.
+    if(ZR_SANITIZERS MATCHES thread AND NOT TEST_COST)
         add_test(NAME ${name} COMMAND ${name} --gtest_brief=1)
         set_tests_properties(${name} PROPERTIES ${properties} TIMEOUT 600)
     else()
