@@ -307,20 +307,29 @@ void SubscriptionStore::change(const std::string& filter, const std::string& des
     }
 }
 
+template <typename Record>
+void SubscriptionStore::takeOut(std::vector<Record>& records,
+                                const std::vector<SubscriptionRecord>& subscriptions,
+                                std::string SubscriptionRecord::*end, const std::string& name,
+                                const std::string& user, const char* inUse) const {
+    const auto found = findRecord(records, name);
+    if (found == records.end()) {
+        refuse(CMPI_RC_ERR_NOT_FOUND, "");
+    }
+    requireOwner(found->creator, user);
+    if (std::any_of(subscriptions.begin(), subscriptions.end(),
+                    [&](const SubscriptionRecord& each) { return each.*end == name; })) {
+        refuse(CMPI_RC_ERR_FAILED, inUse);
+    }
+    records.erase(found);
+}
+
 void SubscriptionStore::removeFilter(const std::string& name, const std::string& user) {
     const std::lock_guard changes(changes_);
     requireRunning();
     SubscriptionRecords changed = records_;
-    const auto found = findRecord(changed.filters, name);
-    if (found == changed.filters.end()) {
-        refuse(CMPI_RC_ERR_NOT_FOUND, "");
-    }
-    requireOwner(found->creator, user);
-    if (std::any_of(changed.subscriptions.begin(), changed.subscriptions.end(),
-                    [&name](const SubscriptionRecord& each) { return each.filter == name; })) {
-        refuse(CMPI_RC_ERR_FAILED, "the filter is subscribed to");
-    }
-    changed.filters.erase(found);
+    takeOut(changed.filters, changed.subscriptions, &SubscriptionRecord::filter, name, user,
+            "the filter is subscribed to");
     replace(std::move(changed));
 }
 
@@ -328,16 +337,8 @@ void SubscriptionStore::removeDestination(const std::string& name, const std::st
     const std::lock_guard changes(changes_);
     requireRunning();
     SubscriptionRecords changed = records_;
-    const auto found = findRecord(changed.destinations, name);
-    if (found == changed.destinations.end()) {
-        refuse(CMPI_RC_ERR_NOT_FOUND, "");
-    }
-    requireOwner(found->creator, user);
-    if (std::any_of(changed.subscriptions.begin(), changed.subscriptions.end(),
-                    [&name](const SubscriptionRecord& each) { return each.destination == name; })) {
-        refuse(CMPI_RC_ERR_FAILED, "the destination is subscribed for");
-    }
-    changed.destinations.erase(found);
+    takeOut(changed.destinations, changed.subscriptions, &SubscriptionRecord::destination, name,
+            user, "the destination is subscribed for");
     replace(std::move(changed));
 }
 

@@ -69,6 +69,11 @@ class SubscriptionStore {
     void requireRunning() const;
     /// Whether the user may change what that one has made.
     void requireOwner(const std::string& creator, const std::string& user) const;
+    /// Takes a record out that the user may remove and that is at the end of no subscription.
+    template <typename Record>
+    void takeOut(std::vector<Record>& records, const std::vector<SubscriptionRecord>& subscriptions,
+                 std::string SubscriptionRecord::*end, const std::string& name,
+                 const std::string& user, const char* inUse) const;
 
     /// Begins to send what the subscription selects.
     [[nodiscard]] Status activate(const SubscriptionRecord& subscription,
