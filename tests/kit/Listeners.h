@@ -42,13 +42,30 @@ inline Instance indication(const std::string& identifier) {
 /// A good listener that keeps what it gets.
 class KeptIndications {
   public:
-    /// Refuses so many first, for want of room.
-    explicit KeptIndications(unsigned refused = 0)
-        : refused_(refused),
-          listener_({}, [this](const wbem::ReceivedIndication& got) { return take(got); }) {}
+    KeptIndications()
+        : listener_({}, [this](const wbem::ReceivedIndication& got) { return take(got); }) {}
 
     [[nodiscard]] std::string url() const {
         return "http://127.0.0.1:" + std::to_string(listener_.port());
+    }
+
+    /// Responds to none from now on; what comes waits.
+    void close() {
+        const std::lock_guard lock(mutex_);
+        closed_ = true;
+    }
+    /// Waits for one that waits for a response.
+    void awaitWaiting() {
+        std::unique_lock lock(mutex_);
+        EXPECT_TRUE(came_.wait_for(lock, longEnough, [&] { return waiting_; }));
+    }
+    /// Responds again, also to the one that waits.
+    void open() {
+        {
+            const std::lock_guard lock(mutex_);
+            closed_ = false;
+        }
+        came_.notify_all();
     }
 
     /// Waits for so many, and gives all.
@@ -71,12 +88,11 @@ class KeptIndications {
   private:
     bool take(const wbem::ReceivedIndication& got) {
         {
-            const std::lock_guard lock(mutex_);
+            std::unique_lock lock(mutex_);
+            waiting_ = closed_;
+            came_.notify_all();
+            came_.wait(lock, [&] { return !closed_; });
             all_.push_back(got);
-            if (refused_ > 0) {
-                --refused_;
-                return false;
-            }
         }
         came_.notify_all();
         return true;
@@ -85,7 +101,8 @@ class KeptIndications {
     std::mutex mutex_;
     std::condition_variable came_;
     std::vector<wbem::ReceivedIndication> all_;
-    unsigned refused_;
+    bool closed_ = false;
+    bool waiting_ = false;
     wbem::Listener listener_;
 };
 
