@@ -14,6 +14,7 @@
 #include "cimom/ClassDeclaration.h"
 #include "cimom/ClassRepository.h"
 #include "cimom/Instance.h"
+#include "cimom/Query.h"
 #include "cimom/Requests.h"
 #include "cimom/Results.h"
 
@@ -21,12 +22,11 @@ namespace cimom::broker {
 
 namespace {
 
-/// What this host really does: reading and traversing; properties are written by
-/// modifyInstance only, nothing is created or deleted.
-constexpr unsigned capabilities = CMPI_MB_BasicRead | CMPI_MB_AssociationTraversal |
-                                  CMPI_MB_Indications | CMPI_MB_OSEncapsulationSupport |
-                                  CMPI_MB_Supports_MemEnhancements |
-                                  CMPI_MB_Supports_Extended_Error;
+/// What this host really does; only methods are not called.
+constexpr unsigned capabilities =
+    CMPI_MB_InstanceManipulation | CMPI_MB_AssociationTraversal | CMPI_MB_QueryExecution |
+    CMPI_MB_Indications | CMPI_MB_OSEncapsulationSupport | CMPI_MB_Supports_MemEnhancements |
+    CMPI_MB_Supports_Extended_Error;
 
 CMPIContext* prepareAttachThread(const CMPIBroker* mb, const CMPIContext* context) {
     return guarded<CMPIContext*>(nullptr, nullptr, [=](CMPIrc&) -> CMPIContext* {
@@ -237,6 +237,88 @@ CMPIStatus modifyInstance(const CMPIBroker* mb, const CMPIContext* context,
     });
 }
 
+CMPIObjectPath* createInstance(const CMPIBroker* mb, const CMPIContext* context,
+                               const CMPIObjectPath* op, const CMPIInstance* instance,
+                               CMPIStatus* rc) {
+    const InstanceRecord* const record = instanceOf(instance);
+    if (record == nullptr) {
+        setStatus(rc, CMPI_RC_ERR_INVALID_PARAMETER);
+        return nullptr;
+    }
+    PathsResult result;
+    const CMPIStatus status = ask(mb, op, [&](RequestHandler& handler, ObjectPath path) {
+        Instance created = toModel(*record);
+        created.path = std::move(path);
+        result = handler.createInstance(created, {std::nullopt, principalOf(context)});
+        return result.status;
+    });
+    if (status.rc != CMPI_RC_OK) {
+        write(rc, status);
+        return nullptr;
+    }
+    return guarded<CMPIObjectPath*>(rc, nullptr, [&](CMPIrc&) {
+        return toRecord(RequestScope::current().arena(), &Broker::of(mb)->classes(),
+                        *result.paths.front());
+    });
+}
+
+CMPIStatus deleteInstance(const CMPIBroker* mb, const CMPIContext* context,
+                          const CMPIObjectPath* op) {
+    return ask(mb, op, [&](RequestHandler& handler, const ObjectPath& path) {
+        return handler.deleteInstance(path, {std::nullopt, principalOf(context)});
+    });
+}
+
+/// The instance with this one property, which is the only one that may change.
+CMPIStatus setProperty(const CMPIBroker* mb, const CMPIContext* context, const CMPIObjectPath* op,
+                       const char* name, const CMPIValue* value, CMPIType type) {
+    const Broker* const broker = Broker::of(mb);
+    const PathRecord* const path = pathOf(op);
+    if (broker == nullptr || path == nullptr || name == nullptr) {
+        return statusOf(broker == nullptr ? CMPI_RC_ERR_INVALID_HANDLE
+                                          : CMPI_RC_ERR_INVALID_PARAMETER);
+    }
+    CMPIStatus made{CMPI_RC_OK, nullptr};
+    const CMPIInstance* const instance =
+        guarded<CMPIInstance*>(&made, nullptr, [&](CMPIrc& code) -> CMPIInstance* {
+            const ObjectPath named = toModel(*path);
+            const ClassDeclaration* const declaration = broker->classes().find(named.className);
+            if (declaration != nullptr && declaration->property(name) == nullptr) {
+                code = CMPI_RC_ERR_NO_SUCH_PROPERTY;
+                return nullptr;
+            }
+            return makeInstance(RequestScope::current().arena(), *path);
+        });
+    if (instance != nullptr) {
+        made = instance->ft->setProperty(instance, name, value, type);
+    }
+    if (made.rc != CMPI_RC_OK) {
+        return made;
+    }
+    const char* only[] = {name, nullptr};
+    return modifyInstance(mb, context, op, instance, only);
+}
+
+/// The path counts for its namespace alone: the query names the class.
+CMPIEnumeration* execQuery(const CMPIBroker* mb, const CMPIContext* context,
+                           const CMPIObjectPath* op, const char* query, const char* language,
+                           CMPIStatus* rc) {
+    if (query == nullptr || language == nullptr) {
+        setStatus(rc, CMPI_RC_ERR_INVALID_PARAMETER);
+        return nullptr;
+    }
+    return askObjects<Instance>(
+        mb, op, rc,
+        [&](RequestHandler& handler, const ObjectPath& path, auto& receiver) -> RequestEnd {
+            try {
+                return handler.execQuery(path.nameSpace, Query::parse(language, query),
+                                         {std::nullopt, principalOf(context)}, receiver);
+            } catch (const QueryError& error) {
+                return {{error.code, error.what()}};
+            }
+        });
+}
+
 AssociationRequest associationRequest(const CMPIContext* context, const char* assocClass,
                                       const char* resultClass, const char* role,
                                       const char* resultRole, const char** properties) {
@@ -314,31 +396,10 @@ CMPIStatus deliverIndication(const CMPIBroker* mb, const CMPIContext*, const cha
 
 // What this host has no meaning for.
 
-CMPIObjectPath* createInstance(const CMPIBroker*, const CMPIContext*, const CMPIObjectPath*,
-                               const CMPIInstance*, CMPIStatus* rc) {
-    setStatus(rc, CMPI_RC_ERR_NOT_SUPPORTED);
-    return nullptr;
-}
-
-CMPIStatus deleteInstance(const CMPIBroker*, const CMPIContext*, const CMPIObjectPath*) {
-    return statusOf(CMPI_RC_ERR_NOT_SUPPORTED);
-}
-
-CMPIEnumeration* execQuery(const CMPIBroker*, const CMPIContext*, const CMPIObjectPath*,
-                           const char*, const char*, CMPIStatus* rc) {
-    setStatus(rc, CMPI_RC_ERR_NOT_SUPPORTED);
-    return nullptr;
-}
-
 CMPIData invokeMethod(const CMPIBroker*, const CMPIContext*, const CMPIObjectPath*, const char*,
                       const CMPIArgs*, CMPIArgs*, CMPIStatus* rc) {
     setStatus(rc, CMPI_RC_ERR_NOT_SUPPORTED);
     return badData();
-}
-
-CMPIStatus setProperty(const CMPIBroker*, const CMPIContext*, const CMPIObjectPath*, const char*,
-                       const CMPIValue*, CMPIType) {
-    return statusOf(CMPI_RC_ERR_NOT_SUPPORTED);
 }
 
 }  // namespace

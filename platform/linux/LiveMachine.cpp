@@ -99,6 +99,9 @@ LiveMachine::LiveMachine(Surroundings surroundings)
 }
 
 bool LiveMachine::changed() {
+    if (signals_.heard()) {
+        monitor_.markChanged();
+    }
     // The conversation with the service processor goes on only when this is called.
     return processor_.changed() || monitor_.changed() || changedByTime() ||
            (troubled_ && surroundings_.uptime() >= troubleRest_);
@@ -130,7 +133,10 @@ bool LiveMachine::awaiting() {
 ChangeSigns LiveMachine::signs() {
     using namespace std::chrono;  // NOLINT(google-build-using-namespace): of this function only
     const auto now = steady_clock::now();
-    ChangeSigns signs{.descriptor = monitor_.sign(), .askAt = std::nullopt};
+    if (signals_.connect(surroundings_.uptime())) {
+        monitor_.markChanged();
+    }
+    ChangeSigns signs{.descriptor = monitor_.sign(signals_.descriptor()), .askAt = std::nullopt};
     if (!signs.descriptor || monitor_.isBlind() || troubled_) {
         signs.askNoLaterThan(now + slowest);
     }
@@ -164,6 +170,7 @@ std::shared_ptr<const Snapshot> LiveMachine::read() {
 
 std::shared_ptr<const Snapshot> LiveMachine::tryToRead() {
     ClientFacts clients = readClients();
+    signals_.follow(clients);
     buses_.consult(clients, surroundings_.uptime());
     NetworkState network = reader_.read(std::chrono::steady_clock::now() + kernelTime);
     std::move(network.diagnostics.begin(), network.diagnostics.end(),

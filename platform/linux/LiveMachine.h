@@ -13,6 +13,7 @@
 
 #include "Unannounced.h"
 #include "clients/ManagerBuses.h"
+#include "clients/ManagerSignals.h"
 #include "formats/Roots.h"
 #include "ipmi/IpmiReader.h"
 #include "kernel/ChangeMonitor.h"
@@ -61,6 +62,7 @@ class LiveMachine final : public SnapshotSource {
 
     Surroundings surroundings_;
     ManagerBuses buses_;
+    ManagerSignals signals_;
     RtnetlinkReader reader_;
     ChangeMonitor monitor_;
     IpmiReader processor_;

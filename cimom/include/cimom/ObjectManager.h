@@ -68,14 +68,12 @@ class ObjectManager final : public RequestHandler {
                                 const InstanceRequest& request = {}) override;
     InstancesResult modifyInstance(const Instance& instance,
                                    const InstanceRequest& request = {}) override;
-    /// Makes an instance of its path's class, in its path's namespace; the keys of that path
-    /// do not count. The result is the path of the instance.
-    PathsResult createInstance(const Instance& instance, const InstanceRequest& request = {});
-    Status deleteInstance(const ObjectPath& path, const InstanceRequest& request = {});
-    /// The instances that the query selects in a namespace, with the selected properties. The
-    /// request's property list does not count.
+    PathsResult createInstance(const Instance& instance,
+                               const InstanceRequest& request = {}) override;
+    Status deleteInstance(const ObjectPath& path, const InstanceRequest& request = {}) override;
     RequestEnd execQuery(const std::string& nameSpace, const Query& query,
-                         const InstanceRequest& request, ResultReceiver<Instance>& receiver);
+                         const InstanceRequest& request,
+                         ResultReceiver<Instance>& receiver) override;
     RequestEnd associatorNames(const ObjectPath& path, const AssociationRequest& request,
                                ResultReceiver<ObjectPath>& receiver) override;
     RequestEnd associators(const ObjectPath& path, const AssociationRequest& request,

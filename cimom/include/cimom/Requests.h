@@ -59,6 +59,16 @@ class RequestHandler {
     virtual InstancesResult getInstance(const ObjectPath& path, const InstanceRequest& request) = 0;
     virtual InstancesResult modifyInstance(const Instance& instance,
                                            const InstanceRequest& request) = 0;
+    /// Makes an instance of its path's class, in its path's namespace; the keys of that path
+    /// do not count. The result is the path of the instance, unless the status is an error.
+    virtual PathsResult createInstance(const Instance& instance,
+                                       const InstanceRequest& request) = 0;
+    virtual Status deleteInstance(const ObjectPath& path, const InstanceRequest& request) = 0;
+    /// The instances that the query selects in a namespace, with the selected properties. The
+    /// request's property list does not count.
+    virtual RequestEnd execQuery(const std::string& nameSpace, const Query& query,
+                                 const InstanceRequest& request,
+                                 ResultReceiver<Instance>& receiver) = 0;
 
     // Associations of the object that the path names.
     virtual RequestEnd associatorNames(const ObjectPath& path, const AssociationRequest& request,

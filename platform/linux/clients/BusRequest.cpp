@@ -12,12 +12,6 @@ namespace ZR::Live {
 namespace {
 
 using Json = nlohmann::json;
-using Deadline = BusRequests::Deadline;
-
-struct UnrefMessage {
-    void operator()(sd_bus_message* message) const noexcept { SdBus::get()->messageUnref(message); }
-};
-using BusMessage = std::unique_ptr<sd_bus_message, UnrefMessage>;
 
 /// Frees what a failed call leaves.
 class BusError {
@@ -41,37 +35,6 @@ class BusError {
   private:
     sd_bus_error error_{};
 };
-
-/// Microseconds to a deadline; 0 when it has passed.
-std::uint64_t left(Deadline deadline) {
-    const auto time = std::chrono::duration_cast<std::chrono::microseconds>(
-        deadline - std::chrono::steady_clock::now());
-    return static_cast<std::uint64_t>(std::max<std::int64_t>(time.count(), 0));
-}
-
-/// Waits until the bus has accepted the connection. The library's own calls would wait for
-/// that without a limit. Returns an errno, 0 for none.
-int awaitReady(sd_bus* bus, Deadline deadline) {
-    for (;;) {
-        const int ready = SdBus::get()->isReady(bus);
-        if (ready != 0) {
-            return ready < 0 ? -ready : 0;
-        }
-        const int done = SdBus::get()->process(bus, nullptr);
-        if (done < 0) {
-            return -done;
-        }
-        if (done == 0) {
-            const std::uint64_t time = left(deadline);
-            if (time == 0) {
-                return ETIMEDOUT;
-            }
-            if (const int waited = SdBus::get()->wait(bus, time); waited < 0 && waited != -EINTR) {
-                return -waited;
-            }
-        }
-    }
-}
 
 /// Makes JSON of what is in a message. The library has checked its form.
 class MessageReader {
@@ -217,10 +180,6 @@ class MessageReader {
 
 }  // namespace
 
-void BusRequests::CloseBus::operator()(sd_bus* bus) const noexcept {
-    SdBus::get()->closeUnref(bus);
-}
-
 BusRequests::BusRequests(const char* program, const char* service, Deadline deadline)
     : program_(program), service_(service), deadline_(deadline), functions_(SdBus::get()) {
     if (functions_->missing().empty()) {
@@ -244,7 +203,7 @@ void BusRequests::open() {
         }
         return;
     }
-    if (const int late = awaitReady(bus_.get(), deadline_); late != 0) {
+    if (const int late = functions_->awaitReady(bus_.get(), deadline_); late != 0) {
         fail(late);
     }
 }
@@ -279,9 +238,9 @@ std::optional<Json> BusRequests::call(const BusMethod& method) {
     BusError error;
     sd_bus_message* responded = nullptr;
     // A timeout of 0 would mean the library's own of 25 seconds.
-    const int call =
-        functions_->call(bus_.get(), request.get(), std::max<std::uint64_t>(left(deadline_), 1),
-                         error.get(), &responded);
+    const int call = functions_->call(bus_.get(), request.get(),
+                                      std::max<std::uint64_t>(microsecondsTo(deadline_), 1),
+                                      error.get(), &responded);
     const BusMessage response{responded};
     if (call < 0) {
         if (!error.tellsOfAbsence(method.nothing)) {

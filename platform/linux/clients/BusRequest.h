@@ -52,10 +52,6 @@ class BusRequests {
     [[nodiscard]] const std::string& failure() const noexcept { return failure_; }
 
   private:
-    struct CloseBus {
-        void operator()(sd_bus* bus) const noexcept;
-    };
-
     void open();
     void fail(const std::string& reason);
     void fail(int error);
@@ -64,7 +60,7 @@ class BusRequests {
     const char* service_;
     Deadline deadline_;
     std::shared_ptr<const SdBus> functions_;
-    std::unique_ptr<sd_bus, CloseBus> bus_;
+    BusConnection bus_;
     std::string failure_;
 };
 

@@ -2,6 +2,8 @@
 
 #include <dlfcn.h>
 
+#include <algorithm>
+#include <cerrno>
 #include <mutex>
 #include <type_traits>
 
@@ -39,6 +41,8 @@ SdBus::SdBus(const char* library) : handle_(::dlopen(library, RTLD_NOW | RTLD_LO
     find(isReady, "sd_bus_is_ready");
     find(process, "sd_bus_process");
     find(wait, "sd_bus_wait");
+    find(getFd, "sd_bus_get_fd");
+    find(addMatchAsync, "sd_bus_add_match_async");
     find(call, "sd_bus_call");
     find(newMethodCall, "sd_bus_message_new_method_call");
     find(setAutoStart, "sd_bus_message_set_auto_start");
@@ -47,13 +51,42 @@ SdBus::SdBus(const char* library) : handle_(::dlopen(library, RTLD_NOW | RTLD_LO
     find(enterContainer, "sd_bus_message_enter_container");
     find(exitContainer, "sd_bus_message_exit_container");
     find(readBasic, "sd_bus_message_read_basic");
+    find(isSignal, "sd_bus_message_is_signal");
     find(messageUnref, "sd_bus_message_unref");
     find(errorHasName, "sd_bus_error_has_name");
     find(errorFree, "sd_bus_error_free");
 }
 
+int SdBus::awaitReady(sd_bus* bus, std::chrono::steady_clock::time_point deadline) const {
+    for (;;) {
+        const int ready = isReady(bus);
+        if (ready != 0) {
+            return ready < 0 ? -ready : 0;
+        }
+        const int done = process(bus, nullptr);
+        if (done < 0) {
+            return -done;
+        }
+        if (done == 0) {
+            const std::uint64_t time = microsecondsTo(deadline);
+            if (time == 0) {
+                return ETIMEDOUT;
+            }
+            if (const int waited = wait(bus, time); waited < 0 && waited != -EINTR) {
+                return -waited;
+            }
+        }
+    }
+}
+
 void SdBus::Close::operator()(void* handle) const noexcept {
     ::dlclose(handle);
+}
+
+std::uint64_t microsecondsTo(std::chrono::steady_clock::time_point deadline) {
+    const auto time = std::chrono::duration_cast<std::chrono::microseconds>(
+        deadline - std::chrono::steady_clock::now());
+    return static_cast<std::uint64_t>(std::max<std::int64_t>(time.count(), 0));
 }
 
 }  // namespace ZR::Live

@@ -2,6 +2,8 @@
 
 #include <systemd/sd-bus.h>
 
+#include <chrono>
+#include <cstdint>
 #include <memory>
 #include <string>
 
@@ -23,11 +25,17 @@ class SdBus {
     /// Why the functions cannot be had; empty when they can. Only then may they be called.
     [[nodiscard]] const std::string& missing() const noexcept { return missing_; }
 
+    /// Waits until the bus has accepted a connection, until the deadline at the latest: the
+    /// library's own calls would wait for that without a limit. Returns an errno, 0 for none.
+    [[nodiscard]] int awaitReady(sd_bus* bus, std::chrono::steady_clock::time_point deadline) const;
+
     decltype(&::sd_bus_open_system) openSystem = nullptr;
     decltype(&::sd_bus_close_unref) closeUnref = nullptr;
     decltype(&::sd_bus_is_ready) isReady = nullptr;
     decltype(&::sd_bus_process) process = nullptr;
     decltype(&::sd_bus_wait) wait = nullptr;
+    decltype(&::sd_bus_get_fd) getFd = nullptr;
+    decltype(&::sd_bus_add_match_async) addMatchAsync = nullptr;
     decltype(&::sd_bus_call) call = nullptr;
     decltype(&::sd_bus_message_new_method_call) newMethodCall = nullptr;
     decltype(&::sd_bus_message_set_auto_start) setAutoStart = nullptr;
@@ -36,6 +44,7 @@ class SdBus {
     decltype(&::sd_bus_message_enter_container) enterContainer = nullptr;
     decltype(&::sd_bus_message_exit_container) exitContainer = nullptr;
     decltype(&::sd_bus_message_read_basic) readBasic = nullptr;
+    decltype(&::sd_bus_message_is_signal) isSignal = nullptr;
     decltype(&::sd_bus_message_unref) messageUnref = nullptr;
     decltype(&::sd_bus_error_has_name) errorHasName = nullptr;
     decltype(&::sd_bus_error_free) errorFree = nullptr;
@@ -47,5 +56,18 @@ class SdBus {
     std::unique_ptr<void, Close> handle_;
     std::string missing_;
 };
+
+struct CloseBus {
+    void operator()(sd_bus* bus) const noexcept { SdBus::get()->closeUnref(bus); }
+};
+using BusConnection = std::unique_ptr<sd_bus, CloseBus>;
+
+struct UnrefMessage {
+    void operator()(sd_bus_message* message) const noexcept { SdBus::get()->messageUnref(message); }
+};
+using BusMessage = std::unique_ptr<sd_bus_message, UnrefMessage>;
+
+/// Microseconds to a deadline; 0 when it has passed.
+[[nodiscard]] std::uint64_t microsecondsTo(std::chrono::steady_clock::time_point deadline);
 
 }  // namespace ZR::Live

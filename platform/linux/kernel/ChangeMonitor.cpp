@@ -107,7 +107,7 @@ void ChangeMonitor::watchProcesses(std::span<const std::int32_t> pids) {
         // The C library has a function for it only in its newer versions.
         UniqueFd descriptor{static_cast<int>(::syscall(SYS_pidfd_open, pid, 0))};
         if (descriptor) {
-            announce(descriptor);
+            announce(descriptor.get());
             processes.emplace(pid, std::move(descriptor));
         } else if (errno == ESRCH) {
             changed_ = true;
@@ -132,7 +132,7 @@ void ChangeMonitor::openSubscription(std::vector<Diagnostic>& diagnostics) {
         blind_ = true;
         return;
     }
-    announce(subscription_);
+    announce(subscription_.get());
 }
 
 void ChangeMonitor::openWatches(std::vector<Diagnostic>& diagnostics) {
@@ -147,29 +147,30 @@ void ChangeMonitor::openWatches(std::vector<Diagnostic>& diagnostics) {
         blind_ = true;
         return;
     }
-    announce(watches_);
+    announce(watches_.get());
 }
 
-UniqueFd ChangeMonitor::sign() {
+UniqueFd ChangeMonitor::sign(int other) {
     if (!announced_) {
         announced_.reset(::epoll_create1(EPOLL_CLOEXEC));
-        announce(subscription_);
-        announce(watches_);
+        announce(subscription_.get());
+        announce(watches_.get());
         for (const auto& [pid, descriptor] : processes_) {
-            announce(descriptor);
+            announce(descriptor.get());
         }
     }
+    announce(other);
     return UniqueFd(announced_ ? ::fcntl(announced_.get(), F_DUPFD_CLOEXEC, 0) : -1);
 }
 
 /// The set keeps no descriptor open: one that is closed leaves it.
-void ChangeMonitor::announce(const UniqueFd& descriptor) {
-    if (!announced_ || !descriptor) {
+void ChangeMonitor::announce(int descriptor) {
+    if (!announced_ || descriptor < 0) {
         return;
     }
     epoll_event event{};
     event.events = EPOLLIN;
-    if (::epoll_ctl(announced_.get(), EPOLL_CTL_ADD, descriptor.get(), &event) != 0) {
+    if (::epoll_ctl(announced_.get(), EPOLL_CTL_ADD, descriptor, &event) != 0 && errno != EEXIST) {
         blind_ = true;  // what it tells would not be heard
     }
 }

@@ -40,9 +40,10 @@ class ChangeMonitor {
     /// Stays true until the next begin(). Never blocks.
     [[nodiscard]] bool changed();
 
-    /// What becomes readable when changed() may become true; made when it is first asked for.
-    /// None where that is not possible.
-    [[nodiscard]] UniqueFd sign();
+    /// What becomes readable when changed() may become true, or when the other descriptor does
+    /// (-1: none), which counts until it is closed. Made when it is first asked for. None where
+    /// that is not possible.
+    [[nodiscard]] UniqueFd sign(int other = -1);
 
     /// Whether something happened that cannot be announced any more.
     [[nodiscard]] bool isMarked() const noexcept { return changed_; }
@@ -66,7 +67,7 @@ class ChangeMonitor {
     void watchAll(const std::vector<WatchedPlace>& places, std::vector<Diagnostic>& diagnostics);
     void watch(const WatchedPlace& place, Arming& arming, std::vector<Diagnostic>& diagnostics);
     int watchAncestor(std::string directory, Arming& arming) const;
-    void announce(const UniqueFd& descriptor);
+    void announce(int descriptor);
     bool drainSubscription();
     bool drainWatches();
     bool concerns(int watch, std::uint32_t mask, std::string_view name);

@@ -2,7 +2,10 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <csignal>
+#include <set>
+#include <sstream>
 
 #include "ProgramRun.h"
 #include "ServedProgram.h"
@@ -11,6 +14,7 @@
 namespace {
 
 using test::Ended;
+using testing::Contains;
 using testing::HasSubstr;
 using testing::MatchesRegex;
 
@@ -20,11 +24,21 @@ class Watch : public test::ProgramTest {
   protected:
     /// "eth0", and in the next tree "eth1" beside it.
     void prepare() const {
-        setTree(test::computer("Computer", bound("eth0")));
-        ZR::Testing::writeFile(directory() / "next",
-                               "{\"nodes\": [" +
-                                   test::computer("Computer", bound("eth0") + ',' + bound("eth1")) +
-                                   "]}");
+        setTree(test::computer("Computer", interfaces(1)));
+        writeTree("next", 2);
+    }
+    /// A tree of so many interfaces, from "eth0" on.
+    void writeTree(const std::string& name, int count) const {
+        ZR::Testing::writeFile(
+            directory() / name,
+            "{\"nodes\": [" + test::computer("Computer", interfaces(count)) + "]}");
+    }
+    static std::string interfaces(int count) {
+        std::string all;
+        for (int number = 0; number < count; ++number) {
+            all += (number == 0 ? "" : ",") + bound("eth" + std::to_string(number));
+        }
+        return all;
     }
 
     static std::string bound(const std::string& name) {
@@ -39,18 +53,21 @@ class Watch : public test::ProgramTest {
             "LeaseExpires": 253402300799, "Client": "dhclient"}}]})";
     }
 
-    /// Runs the program, puts the next tree in the place of the first one as soon as it
-    /// watches, and sends it a signal when it has written a line.
+    /// Puts the next tree in the place of the first one, and waits for what is told of that.
+    static constexpr const char* next =
+        R"(mv "$work/next" "$work/tree.json"; await eth1 "$work/watched")";
+
+    /// Runs the program, does the steps of a shell as soon as it watches, and sends it a signal.
     Ended watch(const std::vector<std::string>& arguments, const std::string& signal,
-                const test::Environment& extra = {}) const {
+                const test::Environment& extra = {}, const std::string& steps = next) const {
         const std::string script = R"(
-            work=$1 signal=$2
-            shift 2
+            work=$1 signal=$2 steps=$3
+            shift 3
             await() {
                 tries=0
                 until grep -q "$1" "$2"; do
                     tries=$((tries + 1))
-                    if [ $tries -gt 600 ]; then
+                    if [ $tries -gt 1200 ]; then
                         kill -KILL $pid
                         return
                     fi
@@ -62,23 +79,25 @@ class Watch : public test::ProgramTest {
             "$@" >"$work/watched" 2>"$work/told" &
             pid=$!
             await watching "$work/told"
-            mv "$work/next" "$work/tree.json"
-            await eth1 "$work/watched"
+            eval "$steps"
             kill "-$signal" $pid
             wait $pid
             status=$?
             cat "$work/watched"
             cat "$work/told" >&2
             exit $status)";
-        std::vector<std::string> words{"-c", script, "sh", directory().path(), signal, program()};
+        std::vector<std::string> words{"-c",   script, "sh",     directory().path(),
+                                       signal, steps,  program()};
         words.insert(words.end(), arguments.begin(), arguments.end());
         return runAs("/bin/sh", words, extra);
     }
 
-    test::ServedProgram serve() const {
+    test::ServedProgram serve() const { return serve("tree.json"); }
+    /// A server of the machine of a tree.
+    test::ServedProgram serve(const std::string& tree) const {
         return {program(),
-                {"--tree", tree(), "--data-dir", dataDir(), "serve", "--listen", "127.0.0.1:0",
-                 "--subscriptions", directory() / "subscriptions"},
+                {"--tree", directory() / tree, "--data-dir", dataDir(), "serve", "--listen",
+                 "127.0.0.1:0", "--subscriptions", directory() / ("subscriptions-" + tree)},
                 {"ZR_CONFIG=" + (directory() / "platform.conf"), "ZR_LOG_SINK=none"}};
     }
 
@@ -134,6 +153,62 @@ TEST_F(Watch, IsToldByServersAndLeavesNothingAtThem) {
     EXPECT_THAT(ended.out, MatchesRegex(std::string(time) +
                                         "  eth1  absent -> bound 192.0.2.17 from 192.0.2.1\n"));
     EXPECT_EQ(leftAt(server), "");
+}
+
+/// The lines without their times, each once; `lines` is how many there were.
+std::set<std::string> distinct(const std::string& text, std::size_t& lines) {
+    std::set<std::string> found;
+    std::istringstream stream(text);
+    lines = 0;
+    for (std::string line; std::getline(stream, line); ++lines) {
+        found.insert(line.substr(std::min(line.find(' '), line.size())));
+    }
+    return found;
+}
+
+TEST_F(Watch, OfAThousandInterfacesAtOnceNoneIsLostOrToldTwice) {
+    setTree(test::computer("Computer", interfaces(1)));
+    writeTree("next", 1000);
+    writeTree("last", 1001);
+    // What is told twice is so before the last one comes. Making and comparing a thousand takes
+    // some seconds without optimization.
+    const Ended ended = watch(onTree({}), "INT", {{"LC_ALL", "C"}}, R"(
+        mv "$work/next" "$work/tree.json"; await 'eth999 ' "$work/watched"
+        mv "$work/last" "$work/tree.json"; await 'eth1000 ' "$work/watched")");
+    EXPECT_EQ(ended.status, 0) << ended.err;
+    std::size_t lines = 0;
+    const std::set<std::string> told = distinct(ended.out, lines);
+    EXPECT_EQ(lines, 1000U);
+    EXPECT_EQ(told.size(), 1000U);
+    EXPECT_THAT(told, Contains("  eth500  absent -> bound 192.0.2.17 from 192.0.2.1"));
+}
+
+TEST_F(Watch, IsToldBySeveralServersAtOnceAndLeavesNothingAtThem) {
+    writeTree("one.json", 1);
+    writeTree("other.json", 1);
+    const test::ServedProgram one = serve("one.json");
+    const test::ServedProgram other = serve("other.json");
+    writeTree("next-one", 60);
+    writeTree("next-other", 80);
+    writeTree("last-one", 1);
+    writeTree("last-other", 79);
+    const Ended ended = watch({"--connect", one.url(), "--connect", other.url(), "watch"}, "INT",
+                              {{"LC_ALL", "C"}}, R"(
+        mv "$work/next-one" "$work/one.json"; mv "$work/next-other" "$work/other.json"
+        await 'eth59 ' "$work/watched"; await 'eth79 ' "$work/watched"
+        mv "$work/last-one" "$work/one.json"; mv "$work/last-other" "$work/other.json"
+        await 'eth59  bound' "$work/watched"; await 'eth79  bound' "$work/watched")");
+    EXPECT_EQ(ended.status, 0) << ended.err;
+    EXPECT_EQ(ended.err, "cimdhcp: watching 2 interfaces of 2 servers\n");
+    std::size_t lines = 0;
+    const std::set<std::string> told = distinct(ended.out, lines);
+    EXPECT_EQ(lines, 59U + 79U + 59U + 1U);
+    EXPECT_EQ(told.size(), lines);
+    const std::string bound = " absent -> bound 192.0.2.17 from 192.0.2.1";
+    EXPECT_THAT(told, Contains("  " + one.url() + "  eth59 " + bound));
+    EXPECT_THAT(told, Contains("  " + other.url() + "  eth79 " + bound));
+    EXPECT_THAT(told, Contains("  " + other.url() + "  eth79  bound 192.0.2.17 -> absent"));
+    EXPECT_EQ(leftAt(one) + leftAt(other), "");
 }
 
 TEST_F(Watch, RemovesWhatARunHasLeftThatWasKilled) {

@@ -164,9 +164,37 @@ TEST_F(BrokerUpcalls, ErrorsComeBackAsStatus) {
 }
 
 TEST_F(BrokerUpcalls, ModifyReachesTheProvider) {
-    EXPECT_EQ(ask()["modifyInstance"], "0");
+    auto told = ask();
+    EXPECT_EQ(told["modifyInstance"], "0");
+    EXPECT_EQ(told["modified"], "changed by a provider");
+}
+
+TEST_F(BrokerUpcalls, SetPropertyChangesThatOneAlone) {
+    EXPECT_EQ(ask()["setProperty"], "0");
     EXPECT_EQ(textOf(*manager.getInstance(path("Test_Left.Id=\"l1\"")).instances.at(0), "Note"),
-              "changed by a provider");
+              "set");
+    EXPECT_THAT(takeLog(), testing::HasSubstr("modifyInstance Test_Left 1 note\n"));
+}
+
+TEST_F(BrokerUpcalls, CreateAndDeleteReachTheProvider) {
+    auto told = ask();
+    EXPECT_EQ(told["createInstance"], "Test_Left=l3");
+    EXPECT_EQ(told["createTwice"], "status " + std::to_string(CMPI_RC_ERR_ALREADY_EXISTS));
+    EXPECT_EQ(told["deleteInstance"], "0");
+    EXPECT_EQ(told["deleteMissingInstance"], std::to_string(CMPI_RC_ERR_NOT_FOUND));
+    const std::string log = takeLog();
+    const std::string id = ".Id:" + std::to_string(CMPI_string) + "\n";
+    EXPECT_THAT(log, testing::HasSubstr("createInstance Test_Left" + id));
+    EXPECT_THAT(log, testing::HasSubstr("deleteInstance Test_Left" + id));
+}
+
+TEST_F(BrokerUpcalls, QueriesSelectInTheNamespaceOfThePath) {
+    auto told = ask();
+    EXPECT_EQ(told["execQuery"], "Test_Left=l1 Test_Right=r1 Test_RightSpecial=s1 3");
+    EXPECT_THAT(told["badQuery"],
+                testing::StartsWith("status " + std::to_string(CMPI_RC_ERR_INVALID_QUERY) + " "));
+    EXPECT_THAT(told["queryOfUnknownClass"],
+                testing::StartsWith("status " + std::to_string(CMPI_RC_ERR_INVALID_CLASS)));
 }
 
 TEST_F(BrokerUpcalls, EndlessRecursionEndsWithAStatus) {

@@ -52,9 +52,27 @@ std::size_t threads() {
         std::distance(std::filesystem::directory_iterator("/proc/self/task"), {}));
 }
 
+/// Whether there are so many threads, or will be: one that was joined is listed for a moment
+/// more, until the kernel has done with it.
+bool comesToThreads(std::size_t expected) {
+    const auto end = std::chrono::steady_clock::now() + 10s;
+    while (threads() != expected && std::chrono::steady_clock::now() < end) {
+        std::this_thread::sleep_for(1ms);
+    }
+    return threads() == expected;
+}
+
 class LeaseWatch : public test::TreeTest {
   protected:
-    void SetUp() override { setTree({test::host({leased("eth0", lease("192.0.2.17"))})}); }
+    void SetUp() override {
+        setTree({test::host({leased("eth0", lease("192.0.2.17"))})});
+        // Loads the providers: the first look at the instances is awaited for two seconds, which
+        // would be too short for that under a checker on a busy machine.
+        for (const char* watched : {"QVXZR_DHCPLease", "QVXZR_DHCPProtocolEndpoint"}) {
+            ASSERT_EQ(manager_.enumerateInstances({"", "root/cimv2", watched, {}}).status,
+                      cimom::Status{});
+        }
+    }
 
     cimom::ObjectManager manager_{configuration()};
     Told told_;
@@ -178,14 +196,14 @@ TEST_F(LeaseWatch, AThousandInterfacesAtOnceAreAllTold) {
 TEST_F(LeaseWatch, HasAThreadOnlyWhileAFilterIsActive) {
     const std::size_t before = threads();
     static_cast<void>(manager_.enumerateInstances({"", "root/cimv2", "QVXZR_DHCPLease", {}}));
-    EXPECT_EQ(threads(), before);
+    EXPECT_TRUE(comesToThreads(before));
     auto one = subscribe(manager_, "SELECT * FROM CIM_InstIndication", told_);
     auto two = subscribe(manager_, "SELECT * FROM CIM_InstCreation", told_);
     EXPECT_EQ(threads(), before + 1);
     one.subscription.end();
     EXPECT_EQ(threads(), before + 1);
     two.subscription.end();
-    EXPECT_EQ(threads(), before);
+    EXPECT_TRUE(comesToThreads(before));
     const auto again = subscribe(manager_, "SELECT * FROM CIM_InstIndication", told_);
     setTree({test::host({leased("eth0", lease("192.0.2.40"))})});
     EXPECT_TRUE(told_.await(1));
@@ -206,7 +224,7 @@ TEST_F(LeaseWatch, TheManagerEndsWithActiveFilters) {
     auto active = subscribe(*manager, "SELECT * FROM CIM_InstIndication", told_);
     ASSERT_EQ(active.status, cimom::Status{});
     manager.reset();
-    EXPECT_EQ(threads(), before);
+    EXPECT_TRUE(comesToThreads(before));
     active.subscription.end();
 }
 
@@ -228,7 +246,7 @@ class LeaseWatchTable : public LeaseWatch, private cimom::broker::IndicationSink
     }
     void TearDown() override {
         EXPECT_EQ(mi_->ft->cleanup(mi_, context(), 1).rc, CMPI_RC_OK);
-        EXPECT_EQ(threads(), before_);
+        EXPECT_TRUE(comesToThreads(before_));
         dlclose(library_);
     }
 
@@ -255,6 +273,7 @@ class LeaseWatchTable : public LeaseWatch, private cimom::broker::IndicationSink
         return mi_->ft->cleanup(mi_, context(), terminating ? 1 : 0).rc;
     }
     bool watches() const { return threads() > before_; }
+    bool ends() const { return comesToThreads(before_); }
 
     CMPIrc take(const cimom::broker::Broker& /*from*/, cimom::Instance indication) override {
         told_.receiver()({std::move(indication), {}});
@@ -303,7 +322,7 @@ TEST_F(LeaseWatchTable, EnablingMayComeBeforeAndAfterFiltersAndTwice) {
     setTree({test::host({leased("eth0", lease("192.0.2.40"))})});
     ASSERT_TRUE(told_.await(1));
     EXPECT_EQ(disable(), CMPI_RC_OK);
-    EXPECT_FALSE(watches());
+    EXPECT_TRUE(ends());
     EXPECT_EQ(disable(), CMPI_RC_OK);
     EXPECT_EQ(enable(), CMPI_RC_OK);
     EXPECT_TRUE(watches()) << "the filter is still there";
@@ -321,7 +340,7 @@ TEST_F(LeaseWatchTable, AFilterThatIsActivatedTwiceGoesWithOneCall) {
     EXPECT_EQ(deactivate(one, 0), CMPI_RC_OK);
     EXPECT_TRUE(watches());
     EXPECT_EQ(deactivate(two, 0), CMPI_RC_OK);
-    EXPECT_FALSE(watches());
+    EXPECT_TRUE(ends());
 }
 
 TEST_F(LeaseWatchTable, ALibraryWithItsThreadIsNotUnloaded) {
@@ -336,7 +355,7 @@ TEST_F(LeaseWatchTable, ACleanupEndsActiveFiltersAndLeavesAllUsable) {
     EXPECT_EQ(enable(), CMPI_RC_OK);
     EXPECT_EQ(activate(filter()), CMPI_RC_OK);
     EXPECT_EQ(cleanup(true), CMPI_RC_OK);
-    EXPECT_FALSE(watches());
+    EXPECT_TRUE(ends());
     EXPECT_EQ(cleanup(true), CMPI_RC_OK);
     EXPECT_EQ(deactivate(filter()), CMPI_RC_OK);
     EXPECT_EQ(activate(filter()), CMPI_RC_OK);

@@ -377,10 +377,13 @@ static void checkServices(const Call* call) {
                some->ft->getCOD(some, &rc) == NULL && rc.rc == CMPI_RC_ERR_NOT_SUPPORTED &&
                !some->ft->evaluateUsingAccessor(some, NULL, NULL, &rc) &&
                rc.rc == CMPI_RC_ERR_NOT_SUPPORTED);
-    report(call, "capabilities",
-           (broker->bft->brokerCapabilities & CMPI_MB_BasicRead) == CMPI_MB_BasicRead &&
-               (broker->bft->brokerCapabilities & CMPI_MB_Indications) == CMPI_MB_Indications &&
-               broker->bft->brokerVersion == CMPIVersion200 && broker->bft->brokerName != NULL);
+    report(
+        call, "capabilities",
+        (broker->bft->brokerCapabilities & CMPI_MB_InstanceManipulation) ==
+                CMPI_MB_InstanceManipulation &&
+            (broker->bft->brokerCapabilities & CMPI_MB_QueryExecution) == CMPI_MB_QueryExecution &&
+            (broker->bft->brokerCapabilities & CMPI_MB_Indications) == CMPI_MB_Indications &&
+            broker->bft->brokerVersion == CMPIVersion200 && broker->bft->brokerName != NULL);
 }
 
 static void checkErrors(const Call* call) {
@@ -537,22 +540,35 @@ static void checkThreads(const Call* call) {
     report(call, "newThreadNull", broker->xft->newThread(NULL, NULL, 0) == NULL);
 }
 
-static void checkUnsupported(const Call* call) {
+static void checkRefusals(const Call* call) {
     CMPIStatus rc = unset();
-    int all = broker->bft->createInstance(broker, call->context, call->path, NULL, &rc) == NULL &&
-              rc.rc == CMPI_RC_ERR_NOT_SUPPORTED;
-    all = all && broker->bft->deleteInstance(broker, call->context, call->path).rc ==
-                     CMPI_RC_ERR_NOT_SUPPORTED;
-    all = all && broker->bft->execQuery(broker, call->context, call->path, "q", "l", &rc) == NULL &&
-          rc.rc == CMPI_RC_ERR_NOT_SUPPORTED;
-    broker->bft->invokeMethod(broker, call->context, call->path, "m", NULL, NULL, &rc);
-    all = all && rc.rc == CMPI_RC_ERR_NOT_SUPPORTED;
-    all = all &&
-          broker->bft->setProperty(broker, call->context, call->path, "p", NULL, CMPI_string).rc ==
-              CMPI_RC_ERR_NOT_SUPPORTED;
-    all = all && broker->bft->deliverIndication(broker, call->context, "n", NULL).rc ==
-                     CMPI_RC_ERR_INVALID_PARAMETER;
-    report(call, "unsupported", all);
+    const CMPIBrokerFT* ask = broker->bft;
+    const CMPIContext* context = call->context;
+    const CMPIObjectPath* path = call->path;
+    report(call, "createNothing",
+           ask->createInstance(broker, context, path, NULL, &rc) == NULL &&
+               rc.rc == CMPI_RC_ERR_INVALID_PARAMETER);
+    report(call, "deleteNothing",
+           ask->deleteInstance(broker, context, NULL).rc == CMPI_RC_ERR_INVALID_PARAMETER);
+    report(call, "queryLanguage",
+           ask->execQuery(broker, context, path, "SELECT * FROM Test_Left", "l", &rc) == NULL &&
+               rc.rc == CMPI_RC_ERR_QUERY_LANGUAGE_NOT_SUPPORTED);
+    report(call, "queryNothing",
+           ask->execQuery(broker, context, path, NULL, "WQL", &rc) == NULL &&
+               rc.rc == CMPI_RC_ERR_INVALID_PARAMETER);
+    report(call, "setUnknownProperty",
+           ask->setProperty(broker, context, path, "p", NULL, CMPI_string).rc ==
+               CMPI_RC_ERR_NO_SUCH_PROPERTY);
+    report(call, "setPropertyOfAnotherType",
+           ask->setProperty(broker, context, path, "Passed", at("x"), CMPI_chars).rc ==
+               CMPI_RC_ERR_TYPE_MISMATCH);
+    report(call, "setNoProperty",
+           ask->setProperty(broker, context, path, NULL, NULL, CMPI_string).rc ==
+               CMPI_RC_ERR_INVALID_PARAMETER);
+    ask->invokeMethod(broker, context, path, "m", NULL, NULL, &rc);
+    report(call, "invokeMethod", rc.rc == CMPI_RC_ERR_NOT_SUPPORTED);
+    report(call, "deliverNothing",
+           ask->deliverIndication(broker, context, "n", NULL).rc == CMPI_RC_ERR_INVALID_PARAMETER);
 }
 
 static CMPIStatus cleanup(CMPIInstanceMI* mi, const CMPIContext* ctx, CMPIBoolean terminating) {
@@ -580,7 +596,7 @@ static CMPIStatus enumerateInstances(CMPIInstanceMI* mi, const CMPIContext* ctx,
     checkErrors(&call);
     checkMemory(&call);
     checkThreads(&call);
-    checkUnsupported(&call);
+    checkRefusals(&call);
     return rslt->ft->returnDone(rslt);
 }
 

@@ -489,7 +489,35 @@ void askOthers(const CMPIContext* context, const CMPIResult* result) {
     one->ft->setProperty(one, "Note", &words, CMPI_string);
     rc = ask.modifyInstance(broker, context, l1, one, nullptr);
     report("modifyInstance", std::to_string(rc.rc));
+    report("modified",
+           std::string(text(ask.getProperty(broker, context, l1, "Note", nullptr).value.string)));
     report("nullPath", outcome(ask.enumerateInstances(broker, context, nullptr, nullptr, &rc), rc));
+    const CMPIValue shorter = textValue("set");
+    report("setProperty",
+           std::to_string(ask.setProperty(broker, context, l1, "note", &shorter, CMPI_string).rc));
+    const auto create = [&](const char* id) {
+        CMPIInstance* const wanted =
+            broker->eft->newInstance(broker, thing("Test_Left", id), nullptr);
+        const CMPIValue value = textValue(id);
+        wanted->ft->setProperty(wanted, "Id", &value, CMPI_string);
+        const CMPIObjectPath* const made =
+            ask.createInstance(broker, context, thing("Test_Left", "of no meaning"), wanted, &rc);
+        return made == nullptr
+                   ? "status " + std::to_string(rc.rc)
+                   : std::string(classOf(made)) + "=" +
+                         std::string(text(made->ft->getKey(made, "Id", nullptr).value.string));
+    };
+    report("createInstance", create("l3"));
+    report("createTwice", create("twice"));
+    report("deleteInstance", std::to_string(ask.deleteInstance(broker, context, l1).rc));
+    report("deleteMissingInstance",
+           std::to_string(ask.deleteInstance(broker, context, thing("Test_Left", "none")).rc));
+    const auto select = [&](const char* query) {
+        return outcome(ask.execQuery(broker, context, base, query, "WQL", &rc), rc);
+    };
+    report("execQuery", select("SELECT Id FROM Test_Base WHERE Id LIKE '%1'"));
+    report("badQuery", select("SELECT"));
+    report("queryOfUnknownClass", select("SELECT * FROM Nobody_Knows"));
 }
 
 struct ThreadWork {

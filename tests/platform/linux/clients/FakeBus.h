@@ -11,6 +11,7 @@
 #include <cstring>
 #include <functional>
 #include <memory>
+#include <mutex>
 #include <stdexcept>
 #include <string>
 #include <thread>
@@ -52,6 +53,12 @@ class FakeBus {
     FakeBus(const FakeBus&) = delete;
     FakeBus& operator=(const FakeBus&) = delete;
 
+    /// Has the program announce something on the connection that there is, or that comes.
+    void announce(std::function<void(sd_bus* bus)> announcement) {
+        const std::lock_guard lock(mutex_);
+        announcement_ = std::move(announcement);
+    }
+
   private:
     struct Close {
         void operator()(sd_bus* bus) const noexcept { sd_bus_close_unref(bus); }
@@ -79,11 +86,19 @@ class FakeBus {
             return;
         }
         while (!ended_) {
+            if (const auto announcement = takeAnnouncement()) {
+                announcement(made);
+            }
             const int done = sd_bus_process(made, nullptr);
             if (done < 0 || (done == 0 && sd_bus_wait(made, moment * 1000ULL) < 0)) {
                 return;  // the other side has closed it
             }
         }
+    }
+
+    std::function<void(sd_bus*)> takeAnnouncement() {
+        const std::lock_guard lock(mutex_);
+        return std::exchange(announcement_, nullptr);
     }
 
     static int respond(sd_bus_message* request, void* self, sd_bus_error* /*error*/) {
@@ -101,6 +116,8 @@ class FakeBus {
     Testing::TemporaryDirectory directory_;
     UniqueFd listener_;
     std::atomic<bool> ended_ = false;
+    std::mutex mutex_;
+    std::function<void(sd_bus*)> announcement_;
     std::thread thread_;
 };
 
