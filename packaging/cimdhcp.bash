@@ -6,7 +6,7 @@ _cimdhcp() {
         --credentials --cacert --insecure --no-header --sort --count --time --color --schema-dir
         --registration-dir --provider-dir --cim-schema --exact --version --help'
     local commands='show watch rename graph tree check classes names instances get modify
-        associators references serve user profiles'
+        associators references serve user profiles metrics exporter'
     # What the program is asked for completions with: the same servers, if there are any.
     local asked=("${COMP_WORDS[0]}")
     local command='' position=0 index
@@ -19,7 +19,7 @@ _cimdhcp() {
                 asked+=("${COMP_WORDS[index]}" "${COMP_WORDS[index + 1]}")
                 ((++index))
                 ;;
-            --tree | --data-dir | --namespace | --format | --hosts | --parallel | --timeout | --sort | --color | --*-dir | --*-class | --role | --result-role | --listen | --tls-* | --users | --max-* | --workers | --io-threads | --*-timeout | --poll | --subscriptions | --listener-cacert | --delivery-retries | --retry-interval | --give-up-after)
+            --tree | --data-dir | --namespace | --format | --hosts | --parallel | --timeout | --sort | --color | --*-dir | --*-class | --role | --result-role | --listen | --tls-* | --users | --config | --output | --max-* | --workers | --io-threads | --*-timeout | --poll | --subscriptions | --listener-cacert | --delivery-retries | --retry-interval | --give-up-after)
                 ((++index))
                 ;;
             -*) ;;
@@ -46,7 +46,7 @@ _cimdhcp() {
             mapfile -t COMPREPLY < <(compgen -W 'auto always never' -- "$word")
             return
             ;;
-        --tls-cert | --tls-key | --users | --hosts | --credentials | --cacert)
+        --tls-cert | --tls-key | --users | --config | --output | --hosts | --credentials | --cacert)
             mapfile -t COMPREPLY < <(compgen -f -- "$word")
             return
             ;;
@@ -92,13 +92,15 @@ _cimdhcp() {
             rename) options+=' --create --force' ;;
             graph) options+=' --svg' ;;
             tree) options+=' --explain' ;;
-            serve) options+=' --listen --tls-cert --tls-key --users --read-only --max-header-line
+            serve) options+=' --listen --tls-cert --tls-key --users --read-only --metrics --max-header-line
                 --max-headers --max-body --max-depth --max-connections --max-waiting --max-stuck
                 --max-result --max-enumerations --workers --io-threads --request-timeout --answer-timeout
                 --enumeration-timeout --max-enumeration-timeout --subscriptions --listener-cacert
                 --max-filters --max-listeners --max-subscriptions --max-queue --delivery-retries
                 --retry-interval --listener-timeout --give-up-after' ;;
             user) options+=' --users --modify' ;;
+            metrics) options+=' --output' ;;
+            exporter) options+=' --config --listen --tls-cert --tls-key --users --check' ;;
             associators) options+=' --names --assoc-class --result-class --role --result-role' ;;
             references) options+=' --names --result-class --role' ;;
         esac

@@ -179,6 +179,8 @@ struct Records {
     UserAddCommand userAdd;
     CheckCommand check;
     ProfilesCommand profiles;
+    MetricsCommand metrics;
+    ExporterCommand exporter;
 };
 
 }  // namespace
@@ -391,6 +393,17 @@ class CommandLineReader::Parser {
         command("profiles", serverGroup, "The profiles that a server advertises", records_.profiles)
             ->footer(profilesHelp);
         addServeOptions(*serve, records_.serve);
+        CLI::App* const metrics =
+            command("metrics", serverGroup, "What Prometheus is told of the machine, once",
+                    records_.metrics);
+        metrics
+            ->add_option("--output", records_.metrics.output,
+                         "Replace this file in one step, for node_exporter's textfile collector")
+            ->type_name("FILE");
+        CLI::App* const exporter =
+            command("exporter", serverGroup, "Tell Prometheus of other machines: GET /probe",
+                    records_.exporter);
+        addExporterOptions(*exporter, records_.exporter);
         CLI::App* const user = app_.add_subcommand("user", "The users of the server");
         user->group(serverGroup)->require_subcommand(1);
         CLI::App* const add = user->add_subcommand(

@@ -35,7 +35,7 @@ struct Options {
     // The servers that are asked in place of the object manager of this process.
     std::vector<std::string> connect;  ///< URLs or hosts
     std::optional<std::string> hosts;  ///< a file of them; "-": standard input
-    std::size_t parallel = 16;         ///< how many servers are asked at the same time
+    std::size_t parallel = 64;         ///< how many servers are asked at the same time
     std::chrono::seconds timeout{30};  ///< for all that is asked of one server
     std::optional<std::string> caCertificate;
     bool insecure = false;
@@ -133,6 +133,7 @@ struct ServeCommand {
     std::optional<std::string> tlsKey;
     std::optional<std::string> users;
     bool readOnly = false;
+    std::optional<std::string> metrics;  ///< where to serve metrics; empty: at the same address
     cimom::wbem::Limits limits;
     std::optional<std::string> subscriptions;  ///< the directory where they are kept
     cimom::wbem::DeliverySettings delivery;
@@ -147,14 +148,29 @@ struct UserAddCommand {
 
     bool operator==(const UserAddCommand&) const = default;
 };
+/// What Prometheus is told of the machine.
+struct MetricsCommand {
+    std::optional<std::string> output;  ///< the file that is replaced; none: standard output
+
+    bool operator==(const MetricsCommand&) const = default;
+};
+/// Tells Prometheus of other machines.
+struct ExporterCommand {
+    std::string config;   ///< the file with the targets
+    ServeCommand server;  ///< where to listen, with which certificate and users
+    bool check = false;   ///< only read the configuration
+
+    bool operator==(const ExporterCommand&) const = default;
+};
 struct CheckCommand {
     bool operator==(const CheckCommand&) const = default;
 };
 
-using Command = std::variant<ShowCommand, WatchCommand, RenameCommand, GraphCommand, TreeCommand,
-                             ClassesCommand, NamesCommand, InstancesCommand, GetCommand,
-                             ModifyCommand, AssociatorsCommand, ReferencesCommand, ServeCommand,
-                             UserAddCommand, CheckCommand, ProfilesCommand>;
+using Command =
+    std::variant<ShowCommand, WatchCommand, RenameCommand, GraphCommand, TreeCommand,
+                 ClassesCommand, NamesCommand, InstancesCommand, GetCommand, ModifyCommand,
+                 AssociatorsCommand, ReferencesCommand, ServeCommand, UserAddCommand, CheckCommand,
+                 ProfilesCommand, MetricsCommand, ExporterCommand>;
 
 struct CommandLine {
     Options options;

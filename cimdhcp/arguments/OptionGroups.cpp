@@ -111,7 +111,7 @@ void addRemoteOptions(CLI::App& app, Options& options) {
         ->group(serversGroup);
     file("--hosts", options.hosts, "WBEM servers to ask, one per line; -: standard input");
     app.add_option("--parallel", options.parallel,
-                   "How many servers are asked at the same time (16)")
+                   "How many servers are asked at the same time (64)")
         ->type_name("N")
         ->check(CLI::Range(1, mostParallel).description(""))
         ->group(serversGroup);
@@ -176,8 +176,32 @@ void addServeOptions(CLI::App& app, ServeCommand& serve) {
     file("--tls-key", serve.tlsKey, "Its private key (PEM)");
     file("--users", serve.users, "Only these users, made by \"cimdhcp user add\"");
     app.add_flag("--read-only", serve.readOnly, "No client may modify");
+    app.add_option("--metrics", serve.metrics,
+                   "Serve GET /metrics for Prometheus, too; at the address of --listen, port "
+                   "9988, by default")
+        ->type_name("[ADDRESS:PORT]")
+        ->expected(0, 1)
+        ->default_str("");
     addLimits(app, serve.limits);
     addDelivery(app, serve);
+}
+
+void addExporterOptions(CLI::App& app, ExporterCommand& exporter) {
+    const auto file = [&app](const char* option, std::optional<std::string>& value,
+                             const char* text) {
+        app.add_option(option, value, text)->type_name("FILE");
+    };
+    app.add_option("--config", exporter.config, "The targets that may be probed (JSON)")
+        ->type_name("FILE")
+        ->required();
+    app.add_option("--listen", exporter.server.listen,
+                   "Where to listen; 127.0.0.1:9989 by default. Any address that other "
+                   "machines reach needs TLS and users")
+        ->type_name("ADDRESS[:PORT]");
+    file("--tls-cert", exporter.server.tlsCertificate, "The certificate with its chain (PEM)");
+    file("--tls-key", exporter.server.tlsKey, "Its private key (PEM)");
+    file("--users", exporter.server.users, "Only these users, made by \"cimdhcp user add\"");
+    app.add_flag("--check", exporter.check, "Only tell whether the configuration can be used");
 }
 
 }  // namespace cimdhcp

@@ -20,6 +20,8 @@ void addWatchOptions(CLI::App& app, WatchCommand& watch);
 /// The command that serves WBEM clients: where it listens, who may send requests, and
 /// what a client may cost.
 void addServeOptions(CLI::App& app, ServeCommand& serve);
+/// The command that tells Prometheus of other machines.
+void addExporterOptions(CLI::App& app, ExporterCommand& exporter);
 
 /// Whether the command sends requests to an object manager, and so can be about another
 /// machine.

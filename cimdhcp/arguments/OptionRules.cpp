@@ -18,13 +18,14 @@ bool isOneOf(const Command& command) noexcept {
 
 /// Whether the result of the command is a list, which can be sorted and counted.
 bool givesList(const Command& command) noexcept {
-    return asksClient(command) &&
-           !isOneOf<WatchCommand, RenameCommand, GraphCommand, GetCommand, ModifyCommand>(command);
+    return asksClient(command) && !isOneOf<WatchCommand, RenameCommand, GraphCommand, GetCommand,
+                                           ModifyCommand, MetricsCommand>(command);
 }
 
 bool hasMofForm(const Command& command) noexcept {
-    return asksClient(command) && !isOneOf<ShowCommand, WatchCommand, RenameCommand, GraphCommand,
-                                           ClassesCommand, ProfilesCommand>(command);
+    return asksClient(command) &&
+           !isOneOf<ShowCommand, WatchCommand, RenameCommand, GraphCommand, ClassesCommand,
+                    ProfilesCommand, MetricsCommand>(command);
 }
 
 [[noreturn]] void refuse(const std::string& reason) {
@@ -71,6 +72,9 @@ void checkFormat(const CommandLine& line) {
             "a graph has no JSON output; it is in Graphviz' language, or with --svg "
             "drawn");
     }
+    if (format == Format::json && std::holds_alternative<MetricsCommand>(line.command)) {
+        refuse("metrics have no JSON output; they are in the text format of Prometheus");
+    }
     if (format == Format::mof && !hasMofForm(line.command)) {
         refuse("this command has no MOF output; use --format table or json");
     }
@@ -98,7 +102,8 @@ void checkLimits(const Command& command) {
 }  // namespace
 
 bool asksClient(const Command& command) noexcept {
-    return !isOneOf<TreeCommand, ServeCommand, UserAddCommand, CheckCommand>(command);
+    return !isOneOf<TreeCommand, ServeCommand, UserAddCommand, CheckCommand, ExporterCommand>(
+        command);
 }
 
 void completeCommandLine(CommandLine& line) {

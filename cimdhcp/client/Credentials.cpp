@@ -8,6 +8,7 @@
 #include <array>
 #include <cerrno>
 #include <charconv>
+#include <cstdlib>
 #include <cstring>
 #include <system_error>
 
@@ -141,7 +142,13 @@ void checkStatus(int fd, const std::string& name, const std::string& file) {
             ExitStatus::notLoaded,
             name + ": belongs to another user, who can change it; use a file of your own");
     }
-    constexpr ::mode_t others = S_IRWXG | S_IRWXO;
+    // Of a file that systemd hands over to a service, an access list gives the service's user the
+    // right to read, which shows as one of the group; only that user gets into the directory.
+    const char* const handedOver = std::getenv("CREDENTIALS_DIRECTORY");
+    const bool isHandedOver = handedOver != nullptr && *handedOver != '\0' &&
+                              file.starts_with(std::string(handedOver) + '/') &&
+                              file.find("/../") == std::string::npos && status.st_uid == 0;
+    const ::mode_t others = isHandedOver ? S_IWGRP | S_IXGRP | S_IRWXO : S_IRWXG | S_IRWXO;
     if ((status.st_mode & others) != 0) {
         throw Failure(ExitStatus::notLoaded,
                       name +

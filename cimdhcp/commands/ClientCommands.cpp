@@ -11,6 +11,7 @@
 #include "commands/DiagnosticText.h"
 #include "commands/Findings.h"
 #include "commands/Graph.h"
+#include "commands/Metrics.h"
 #include "commands/Overview.h"
 #include "commands/PlatformSetup.h"
 #include "commands/Profiles.h"
@@ -63,6 +64,17 @@ class Execution {
                 "", std::nullopt};
     }
 
+    Outcome operator()(const MetricsCommand& command) const {
+        const MachineInterfaces machine = askMachine(client_, AskDiagnostics::Yes);
+        const std::string text = cimom::wbem::metricsText(
+            machineMetrics(machine, presentation_.now), cimom::wbem::MetricsFormat::text);
+        if (!command.output) {
+            return {text, "", std::nullopt};
+        }
+        replaceFile(*command.output, text);
+        return {};
+    }
+
     Outcome operator()(const RenameCommand& command) const {
         const RenameReport report = rename(command, client_);
         return {presentation_.json() ? renameJson(report) : renameText(report),
@@ -86,7 +98,8 @@ class Execution {
 
     template <typename Kind>
     Outcome operator()(const Kind& command) const {
-        if constexpr (isOneOf<Kind, TreeCommand, ServeCommand, UserAddCommand, WatchCommand>) {
+        if constexpr (isOneOf<Kind, TreeCommand, ServeCommand, UserAddCommand, WatchCommand,
+                              ExporterCommand>) {
             throw Failure(ExitStatus::usage, "this command does not ask one server once");
         } else {
             CimOperation operation = cimdhcp::carryOut(command, client_);

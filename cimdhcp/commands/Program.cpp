@@ -4,6 +4,7 @@
 #include <cstdlib>
 #include <exception>
 #include <memory>
+#include <mutex>
 #include <ostream>
 #include <type_traits>
 #include <variant>
@@ -16,6 +17,8 @@
 #include "commands/ClientCommands.h"
 #include "commands/Findings.h"
 #include "commands/Fleet.h"
+#include "commands/Metrics.h"
+#include "commands/Overview.h"
 #include "commands/PlatformSetup.h"
 #include "commands/Serve.h"
 #include "commands/UserAdd.h"
@@ -62,7 +65,17 @@ class Execution {
     void operator()(const ServeCommand& command) const {
         tellOfTree();
         const auto client = openClient(line_.options);
-        serve(command, client->manager(), outputs_.out);
+        // The client is for one thread at a time, and each scrape asks it.
+        std::mutex mutex;
+        const auto ask = [&] {
+            const std::lock_guard lock(mutex);
+            return machineMetrics(askMachine(*client, AskDiagnostics::Yes), secondsNow());
+        };
+        serve(command, client->manager(), ask, outputs_.out);
+    }
+
+    void operator()(const ExporterCommand& command) const {
+        serveExporter(command, line_.options, outputs_.out);
     }
 
     void operator()(const CheckCommand& /*command*/) const {
@@ -144,9 +157,10 @@ ExitStatus runLine(const CommandLine& line, const Outputs& outputs, const Style&
     if (line.options.remote()) {
         return runRemotely(line, presentation, outputs, errorStyle);
     }
-    // A user is added without a look at the machine; the check sets the platform up itself,
-    // and goes on when that fails.
+    // A user is added, and other machines are asked, without a look at the machine; the check sets
+    // the platform up itself, and goes on when that fails.
     if (!std::holds_alternative<UserAddCommand>(line.command) &&
+        !std::holds_alternative<ExporterCommand>(line.command) &&
         !std::holds_alternative<CheckCommand>(line.command)) {
         setUpPlatform(line.options, outputs.err);
     }

@@ -18,6 +18,10 @@ ExitStatus runRemotely(const CommandLine& line, const Presentation& presentation
     if (several && graph != nullptr && graph->svg) {
         throw Failure(ExitStatus::usage, "--svg draws one machine; ask one server at a time");
     }
+    if (several && std::holds_alternative<MetricsCommand>(line.command)) {
+        throw Failure(ExitStatus::usage,
+                      "metrics are those of one machine; \"cimdhcp exporter\" tells of many");
+    }
     warnOfInsecurity(line.options, outputs.err);
     const Interruption interruption;
     const ServerAccess access(line.options, interruption.wanted());

@@ -44,26 +44,6 @@ std::string pemText(const std::string& file) {
     return *std::move(content);
 }
 
-cimom::wbem::ServerSettings settingsOf(const ServeCommand& command) {
-    const Listening listening = readListening(command.listen);
-    cimom::wbem::ServerSettings settings;
-    settings.address = listening.address;
-    settings.port = listening.port;
-    settings.readOnly = command.readOnly;
-    settings.limits = command.limits;
-    if (command.tlsCertificate.has_value() != command.tlsKey.has_value()) {
-        throw Failure(ExitStatus::usage, "--tls-cert and --tls-key belong together");
-    }
-    if (command.tlsCertificate) {
-        settings.tls.emplace(cimom::wbem::ServerSettings::Tls{pemText(*command.tlsCertificate),
-                                                              pemText(*command.tlsKey)});
-    }
-    if (command.users) {
-        settings.users = cimom::wbem::readUsers(*command.users);
-    }
-    return settings;
-}
-
 /// What the interop namespace tells of the server.
 cimom::CommunicationMechanism communicationMechanism(const cimom::wbem::ServerSettings& settings) {
     // Numbers of the value maps of CIM_ObjectManagerCommunicationMechanism.
@@ -182,12 +162,63 @@ class EndInTime {
     std::thread thread_;
 };
 
+/// The families of the server itself.
+MetricFamilies serverMetrics(const cimom::wbem::Server& server,
+                             const cimom::wbem::Subscriptions* subscriptions) {
+    MetricFamilies families = server.counts().families();
+    families.push_back(buildInfo("cimdhcp_server"));
+    const std::size_t count = subscriptions == nullptr ? 0 : subscriptions->count();
+    families.push_back({"cimdhcp_server_subscriptions",
+                        cimom::wbem::MetricFamily::Kind::gauge,
+                        "Subscriptions of clients to indications.",
+                        "",
+                        {{{}, static_cast<double>(count), ""}}});
+    return families;
+}
+
+/// The same address, users, certificate and limits as the server's, and another port.
+cimom::wbem::ServerSettings metricsSettings(cimom::wbem::ServerSettings settings,
+                                            const std::string& place) {
+    constexpr std::uint16_t metricsPort = 9988;
+    settings.port = metricsPort;
+    if (!place.empty()) {
+        const Listening listening = readListening(place, "--metrics");
+        settings.address = listening.address;
+        settings.port = listening.port.value_or(metricsPort);
+    }
+    return settings;
+}
+
 }  // namespace
 
-Listening readListening(const std::string& text) {
-    const auto refuse = [&text] {
-        throw Failure(ExitStatus::usage,
-                      "--listen: \"" + printable(text) + "\" is not of the form ADDRESS[:PORT]");
+cimom::wbem::ServerSettings settingsOf(const ServeCommand& command) {
+    const Listening listening = readListening(command.listen);
+    cimom::wbem::ServerSettings settings;
+    settings.address = listening.address;
+    settings.port = listening.port;
+    settings.readOnly = command.readOnly;
+    settings.limits = command.limits;
+    if (command.tlsCertificate.has_value() != command.tlsKey.has_value()) {
+        throw Failure(ExitStatus::usage, "--tls-cert and --tls-key belong together");
+    }
+    if (command.tlsCertificate) {
+        settings.tls.emplace(cimom::wbem::ServerSettings::Tls{pemText(*command.tlsCertificate),
+                                                              pemText(*command.tlsKey)});
+    }
+    if (command.users) {
+        settings.users = cimom::wbem::readUsers(*command.users);
+    }
+    return settings;
+}
+
+cimom::wbem::ServerLog serverLog() {
+    return log;
+}
+
+Listening readListening(const std::string& text, const char* option) {
+    const auto refuse = [&text, option] {
+        throw Failure(ExitStatus::usage, std::string(option) + ": \"" + printable(text) +
+                                             "\" is not of the form ADDRESS[:PORT]");
     };
     Listening listening{text, std::nullopt};
     std::size_t colon = text.rfind(':');
@@ -218,7 +249,8 @@ Listening readListening(const std::string& text) {
     return listening;
 }
 
-void serve(const ServeCommand& command, cimom::ObjectManager& manager, std::ostream& out) {
+void serve(const ServeCommand& command, cimom::ObjectManager& manager, AskMetrics ask,
+           std::ostream& out) {
     const sigset_t signals = blockEndSignals();
     try {
         // Shorter than service managers wait before they kill.
@@ -239,9 +271,21 @@ void serve(const ServeCommand& command, cimom::ObjectManager& manager, std::ostr
             log(cimom::wbem::LogKind::notice,
                 "the schema lacks CIM_IndicationFilter: clients cannot subscribe");
         }
-        cimom::wbem::Server server(manager, std::move(settings), log);
+        const cimom::wbem::ServerSettings forMetrics =
+            command.metrics ? metricsSettings(settings, *command.metrics)
+                            : cimom::wbem::ServerSettings();
+        const cimom::wbem::Server server(manager, std::move(settings), log);
+        std::unique_ptr<cimom::wbem::Server> metrics;
+        if (command.metrics) {
+            metrics = serveMetrics(
+                forMetrics, std::move(ask),
+                [&] { return serverMetrics(server, subscriptions.get()); }, log);
+        }
         log(cimom::wbem::LogKind::notice, "listening on " + server.url());
         out << "Listening on " << server.url() << std::endl;
+        if (metrics) {
+            out << "Metrics at " << metrics->url() << "metrics" << std::endl;
+        }
         int signal = 0;
         while (::sigwait(&signals, &signal) != 0) {
         }

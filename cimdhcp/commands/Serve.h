@@ -7,6 +7,8 @@
 
 #include "arguments/Commands.h"
 #include "cimom/Forward.h"
+#include "commands/Metrics.h"
+#include "wbem/ServerSettings.h"
 
 namespace cimdhcp {
 
@@ -18,12 +20,21 @@ struct Listening {
     bool operator==(const Listening&) const = default;
 };
 
-/// Throws Failure with ExitStatus::usage.
-[[nodiscard]] Listening readListening(const std::string& text);
+/// Throws Failure with ExitStatus::usage, which names the option.
+[[nodiscard]] Listening readListening(const std::string& text, const char* option = "--listen");
+
+/// What the command says about listener, certificate, users and limits. Throws Failure and
+/// UsersError.
+[[nodiscard]] cimom::wbem::ServerSettings settingsOf(const ServeCommand& command);
+
+/// Where the lines of servers go: to the log channel.
+[[nodiscard]] cimom::wbem::ServerLog serverLog();
 
 /// Runs the WBEM server until the process gets SIGTERM or SIGINT, which it blocks
-/// in this thread. Prints one line when the server accepts connections, and logs the rest.
-/// Throws Failure when the server cannot start.
-void serve(const ServeCommand& command, cimom::ObjectManager& manager, std::ostream& out);
+/// in this thread. Prints one line when the server accepts connections, and another one when it
+/// serves metrics, for which `ask` asks the machine; logs the rest. Throws Failure when the
+/// server cannot start.
+void serve(const ServeCommand& command, cimom::ObjectManager& manager, AskMetrics ask,
+           std::ostream& out);
 
 }  // namespace cimdhcp

@@ -20,10 +20,10 @@ class ServerAccess {
     /// A client with as much time for all its requests as the options give. Throws Failure
     /// when a password would be sent where others can read it.
     [[nodiscard]] RemoteClient clientOf(const ServerUrl& server) const;
-
-  private:
+    /// How such a client gets to the server. Throws Failure as clientOf() does.
     [[nodiscard]] HttpSettings settingsFor(const ServerUrl& server) const;
 
+  private:
     const Options& options_;
     HttpSettings settings_;
     std::vector<Credential> credentials_;

@@ -24,7 +24,7 @@ ORDERS = {
                        ["clients", "configuration"], ["."]],
     "provider": [["include"], ["Lindows"], ["CMPI"], ["."]],
     "cimom": [["model"], ["mof"], ["query"], ["broker", "broker/objects"], ["manager"], ["interop"]],
-    "wbem/server": [["operations"], ["http"]],
+    "wbem/server": [["metrics"], ["operations"], ["http"]],
     "cimdhcp": [["text"], ["client"], ["arguments"], ["commands"], ["."]],
 }
 

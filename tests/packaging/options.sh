@@ -8,7 +8,7 @@ program=$1
 manual=$2
 completion=$3
 commands=(show watch rename graph tree check classes names instances get modify associators
-    references serve "user add" profiles)
+    references serve "user add" profiles metrics exporter)
 
 # Long options, one per line.
 options() { grep -oE -e '(^|[^a-zA-Z0-9-])--[a-z][a-z-]*[a-z]' | sed 's/^[^-]*//' | LC_ALL=C sort -u; }

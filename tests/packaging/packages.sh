@@ -38,6 +38,12 @@ dpkg --install *.deb >/dev/null
 test -x /usr/bin/cimdhcp
 command -v cimdhcp
 grep -x 'ExecStart=/usr/bin/cimdhcp serve --read-only' /usr/lib/systemd/system/cimdhcp.service
+grep -E '^ExecStart=/usr/bin/cimdhcp (metrics|exporter) ' \
+    /usr/lib/systemd/system/cimdhcp-{metrics,exporter}.service >/dev/null
+# They are off until a person turns them on.
+test -e /usr/lib/systemd/system/cimdhcp-metrics.timer
+[[ -z $(find /etc/systemd/system -name 'cimdhcp*') ]]
+test -s /usr/share/cimdhcp/monitoring/dashboard.json
 for page in man1/cimdhcp.1 man5/zr-platform.conf.5 man8/provider-register.sh.8; do
     test -s /usr/share/man/$page.gz
 done

@@ -19,6 +19,10 @@ Subscriptions::Subscriptions(ObjectManager& manager, IndicationHub& hub,
     store_->start();
 }
 
+std::size_t Subscriptions::count() const {
+    return store_->records().subscriptions.size();
+}
+
 Subscriptions::~Subscriptions() {
     store_->stop();
 }

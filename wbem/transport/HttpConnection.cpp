@@ -107,7 +107,8 @@ class HttpConnection::Transfer {
         reason_ = Reason::none;
         error_.front() = '\0';
         set(CURLOPT_TIMEOUT_MS, static_cast<long>(left.count()));
-        set(CURLOPT_CONNECTTIMEOUT_MS, static_cast<long>(left.count()));
+        set(CURLOPT_CONNECTTIMEOUT_MS,
+            static_cast<long>(std::min(left, settings_.connectPatience).count()));
         set(CURLOPT_HTTPHEADER, list.get());
         set(CURLOPT_POSTFIELDSIZE_LARGE, static_cast<curl_off_t>(body.size()));
         set(CURLOPT_POSTFIELDS, body.c_str());
@@ -196,6 +197,10 @@ class HttpConnection::Transfer {
         return 0;
     }
 
+    /// Whether a time that is over is the one for the connection to stand, the only one that is
+    /// shorter than the whole.
+    [[nodiscard]] bool isUnconnected() const { return deadline_.left().count() > 0; }
+
     [[nodiscard]] std::string tooLate() const {
         return "no response within " +
                std::to_string(
@@ -213,10 +218,11 @@ class HttpConnection::Transfer {
         return number == 0 ? std::string() : std::strerror(static_cast<int>(number));
     }
 
-    static ConnectionError::Kind kindOf(CURLcode code) noexcept {
+    [[nodiscard]] ConnectionError::Kind kindOf(CURLcode code) const {
         switch (code) {
             case CURLE_OPERATION_TIMEDOUT:
-                return ConnectionError::Kind::tooLate;
+                return isUnconnected() ? ConnectionError::Kind::other
+                                       : ConnectionError::Kind::tooLate;
             case CURLE_PEER_FAILED_VERIFICATION:
                 return ConnectionError::Kind::notTrusted;
             case CURLE_SSL_CACERT_BADFILE:
@@ -242,7 +248,12 @@ class HttpConnection::Transfer {
         }
         switch (code) {
             case CURLE_OPERATION_TIMEDOUT:
-                return tooLate();
+                return isUnconnected() ? "cannot be reached: no connection within " +
+                                             std::to_string(std::chrono::ceil<std::chrono::seconds>(
+                                                                settings_.connectPatience)
+                                                                .count()) +
+                                             " s"
+                                       : tooLate();
             case CURLE_COULDNT_RESOLVE_HOST:
                 return "there is no address for the name " + url_.host;
             case CURLE_COULDNT_CONNECT: {

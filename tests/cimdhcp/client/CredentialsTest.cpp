@@ -108,6 +108,25 @@ TEST_F(CredentialsFile, IsForItsOwnerAlone) {
     EXPECT_EQ(readCredentials(file_).size(), 1U);
 }
 
+TEST_F(CredentialsFile, ThatSystemdHandsOverMayBeReadByAGroup) {
+    if (::geteuid() != 0) {
+        GTEST_SKIP() << "only a file of root's is one that systemd hands over";
+    }
+    const auto inService = [this](const std::string& credentials) {
+        return ZR::Testing::inChild([this, &credentials] {
+                   ::setenv("CREDENTIALS_DIRECTORY", credentials.c_str(), 1);
+                   return refusal();
+               })
+            .output;
+    };
+    ::chmod(file_.c_str(), 0440);
+    EXPECT_EQ(inService(directory_.path()), "accepted");
+    EXPECT_THAT(inService(directory_.path().string() + "/other"), HasSubstr("chmod 600"));
+    EXPECT_THAT(inService(""), HasSubstr("chmod 600"));
+    ::chmod(file_.c_str(), 0444);
+    EXPECT_THAT(inService(directory_.path()), HasSubstr("chmod 600"));
+}
+
 TEST_F(CredentialsFile, OfAnotherUserIsRefused) {
     if (::geteuid() != 0) {
         GTEST_SKIP() << "only root can give a file away";

@@ -46,23 +46,30 @@ ServedProgram::ServedProgram(const std::string& program, const std::vector<std::
         throw std::system_error(errno, std::generic_category(), "fork");
     }
     input.reset();
-    std::string text;
-    std::array<char, 1024> piece{};
-    while (text.find('\n') == std::string::npos) {
-        const ssize_t got = ::read(output_.get(), piece.data(), piece.size());
-        if (got <= 0) {
-            end();
-            throw std::runtime_error("the server has not started: " + text);
-        }
-        text.append(piece.data(), static_cast<std::size_t>(got));
-    }
+    const std::string text = line();
     const std::string before = "Listening on ";
-    const std::size_t path = text.find("/cimom\n");
+    const std::size_t path = text.rfind('/');
     if (!text.starts_with(before) || path == std::string::npos) {
         end();
         throw std::runtime_error("the server has not started: " + text);
     }
     url_ = text.substr(before.size(), path - before.size());
+}
+
+std::string ServedProgram::line() {
+    std::array<char, 1024> piece{};
+    while (written_.find('\n') == std::string::npos) {
+        const ssize_t got = ::read(output_.get(), piece.data(), piece.size());
+        if (got <= 0) {
+            end();
+            throw std::runtime_error("the server has ended: " + written_);
+        }
+        written_.append(piece.data(), static_cast<std::size_t>(got));
+    }
+    const std::size_t length = written_.find('\n');
+    std::string first = written_.substr(0, length);
+    written_.erase(0, length + 1);
+    return first;
 }
 
 ServedProgram::~ServedProgram() {

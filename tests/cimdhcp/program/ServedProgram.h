@@ -27,6 +27,9 @@ class ServedProgram {
     /// "127.0.0.1:40123"
     [[nodiscard]] std::string host() const { return url_.substr(url_.rfind('/') + 1); }
 
+    /// The next line that it writes behind the first one. Throws when it ends before that.
+    [[nodiscard]] std::string line();
+
     [[nodiscard]] pid_t process() const noexcept { return child_; }
 
     /// Ends it by SIGTERM; its exit status, below 0 for another signal.
@@ -36,6 +39,7 @@ class ServedProgram {
     ZR::Testing::TemporaryDirectory state_;
     pid_t child_ = -1;
     ZR::UniqueFd output_;
+    std::string written_;  ///< and not yet taken
     std::string url_;
 };
 

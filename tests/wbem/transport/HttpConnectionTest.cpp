@@ -49,6 +49,15 @@ TEST(HttpConnection, PostsAndTakesTheResponse) {
     EXPECT_THAT(request, Not(HasSubstr("Expect")));
 }
 
+TEST(HttpConnection, WaitsForAConnectionShorterThanForAResponse) {
+    // It accepts connections, and does not speak TLS.
+    const ::test::RawServer silent({});
+    HttpSettings settings;
+    settings.connectPatience = milliseconds(50);
+    EXPECT_EQ(reason("https://127.0.0.1:" + std::to_string(silent.port()), settings),
+              "cannot be reached: no connection within 1 s");
+}
+
 TEST(HttpConnection, SendsUserAndPasswordAtOnce) {
     const ::test::RawServer server({::test::httpResponse("")});
     HttpSettings settings;

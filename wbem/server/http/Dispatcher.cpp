@@ -7,16 +7,20 @@
 
 namespace cimom::wbem {
 
-Dispatcher::Dispatcher(ObjectManager& manager, const ServerSettings& settings, const ServerLog& log)
-    : settings_(settings),
+Dispatcher::Dispatcher(ObjectManager* manager, const PageHandler& pages,
+                       const ServerSettings& settings, const ServerLog& log, ServerCounts& counts)
+    : pages_(pages),
+      settings_(settings),
       log_(log),
-      operations_(manager, settings.limits,
-                  [&log](const Modification& modification) {
-                      log(LogKind::modification, modificationText(modification));
-                  }),
+      counts_(counts),
       workers_(settings.limits.workers, settings.limits.waiting, settings.limits.stuck),
       gate_(1, settings.limits.waiting),
       timers_(1, settings.limits.waiting) {
+    if (manager != nullptr) {
+        operations_.emplace(*manager, settings.limits, [&log](const Modification& modification) {
+            log(LogKind::modification, modificationText(modification));
+        });
+    }
     if (settings_.users) {
         authenticator_.emplace(*settings_.users);
     }
@@ -65,6 +69,7 @@ void Dispatcher::runOrRefuse(TaskPool& pool, const SharedExchange& exchange, Tas
 }
 
 void Dispatcher::refuse(const SharedExchange& exchange, const std::string& who) {
+    counts_.credentialsRefused();
     log_(LogKind::refusal, "refused " + who + " from " + exchange->address() + ", refusal number " +
                                std::to_string(authenticator_->countRefusal()));
     if (!timers_.runAfter(settings_.refusalDelay,
@@ -79,7 +84,9 @@ void Dispatcher::runAfter(TaskPool::Clock::duration delay, TaskPool::Task task) 
 }
 
 void Dispatcher::endOverdue() {
-    operations_.sessions().expire();
+    if (operations_) {
+        operations_->sessions().expire();
+    }
     const std::size_t replaced = workers_.replaceStuck(settings_.limits.request);
     if (replaced > 0) {
         log_(LogKind::failure, std::to_string(replaced) +
@@ -94,6 +101,20 @@ void Dispatcher::stop() {
     workers_.stop();
 }
 
+HttpResponse Dispatcher::carryOut(const SharedExchange& exchange, const Caller& caller) {
+    if (!operations_) {
+        return HttpResponse::of(pages_(*exchange->page));
+    }
+    const Call call = readCall(exchange->body, settings_.limits.depth);
+    checkAgreement(*exchange->headers, call);
+    Caller asking = caller;
+    asking.gone = [&exchange] { return exchange->isFinished(); };
+    const auto start = Exchange::Clock::now();
+    ResponseBody body = operations_->perform(call, asking);
+    counts_.operationDone(Operations::nameOf(call), body.status(), Exchange::Clock::now() - start);
+    return HttpResponse::of(std::move(body));
+}
+
 void Dispatcher::work(const SharedExchange& exchange, const Caller& caller) {
     if (exchange->isFinished()) {
         // Its time was over before a worker came: the client has been told that
@@ -101,11 +122,7 @@ void Dispatcher::work(const SharedExchange& exchange, const Caller& caller) {
         return;
     }
     try {
-        const Call call = readCall(exchange->body, settings_.limits.depth);
-        checkAgreement(*exchange->headers, call);
-        Caller asking = caller;
-        asking.gone = [&exchange] { return exchange->isFinished(); };
-        exchange->finish(HttpResponse::of(operations_.perform(call, asking)));
+        exchange->finish(carryOut(exchange, caller));
     } catch (const HttpFailure& failure) {
         log_(LogKind::request, exchange->address() + ": " + failure.what());
         exchange->finish(HttpResponse::failure(failure));

@@ -7,6 +7,8 @@
 #include "http/Exchange.h"
 #include "http/TaskPool.h"
 #include "operations/Operations.h"
+#include "wbem/Metrics.h"
+#include "wbem/Pages.h"
 #include "wbem/ServerSettings.h"
 
 namespace cimom::wbem {
@@ -16,8 +18,9 @@ namespace cimom::wbem {
 /// use.
 class Dispatcher {
   public:
-    /// Borrows all three.
-    Dispatcher(ObjectManager& manager, const ServerSettings& settings, const ServerLog& log);
+    /// Borrows all of them. Null for `manager`: requests are for pages.
+    Dispatcher(ObjectManager* manager, const PageHandler& pages, const ServerSettings& settings,
+               const ServerLog& log, ServerCounts& counts);
 
     /// Sees to the response to a request that is complete and handed over.
     void dispatch(const SharedExchange& exchange);
@@ -38,10 +41,13 @@ class Dispatcher {
     void runOrRefuse(TaskPool& pool, const SharedExchange& exchange, TaskPool::Task task);
     /// Carries a request out, in a worker.
     void work(const SharedExchange& exchange, const Caller& caller);
+    [[nodiscard]] HttpResponse carryOut(const SharedExchange& exchange, const Caller& caller);
 
+    const PageHandler& pages_;
     const ServerSettings& settings_;
     const ServerLog& log_;
-    Operations operations_;
+    ServerCounts& counts_;
+    std::optional<Operations> operations_;
     std::optional<Authenticator> authenticator_;
     // End first, in this order reversed: their tasks use all of the above.
     TaskPool workers_;

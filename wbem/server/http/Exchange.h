@@ -11,6 +11,7 @@
 
 #include "http/HttpHead.h"
 #include "http/HttpResponse.h"
+#include "wbem/Pages.h"
 
 namespace cimom::wbem {
 
@@ -26,6 +27,7 @@ class Exchange {
 
     // While the request is being read, by one thread.
     std::optional<CimHeaders> headers;
+    std::optional<PageRequest> page;  ///< what a client of a server of pages asks for
     std::string body;
     std::size_t discarded = 0;          ///< bytes of the body that are not kept
     std::optional<HttpResponse> early;  ///< decided before the body had arrived

@@ -84,6 +84,14 @@ HttpResponse HttpResponse::refusal() {
     return response;
 }
 
+HttpResponse HttpResponse::of(Page page) {
+    HttpResponse made;
+    made.status = page.status;
+    made.begun = std::move(page.text);
+    made.contentType = std::move(page.contentType);
+    return made;
+}
+
 HttpResponse HttpResponse::of(ResponseBody body) {
     HttpResponse made;
     body.write(made.begun, pieceSize);
@@ -113,6 +121,9 @@ MHD_Result sendResponse(MHD_Connection* connection, HttpResponse response, bool 
         add(manPost ? "73-CIMOperation" : "CIMOperation", "MethodResponse");
         add("WBEMServerResponseTime", std::to_string(serverTime.count()));
     }
+    if (!response.contentType.empty()) {
+        add("Content-Type", response.contentType);
+    }
     if (!response.cimError.empty()) {
         add("CIMError", response.cimError);
     }
@@ -120,7 +131,7 @@ MHD_Result sendResponse(MHD_Connection* connection, HttpResponse response, bool 
         add("WWW-Authenticate", R"(Basic realm="CIM", charset="UTF-8")");
     }
     if (response.status == http::methodNotAllowed) {
-        add("Allow", "POST, M-POST");
+        add("Allow", response.allowed);
     }
     if (response.status == http::serviceUnavailable) {
         add("Retry-After", "10");

@@ -13,6 +13,7 @@
 #include "http/Connections.h"
 #include "http/Dispatcher.h"
 #include "http/Exchange.h"
+#include "http/PageHead.h"
 #include "transport/ListeningSocket.h"
 
 namespace cimom::wbem {
@@ -42,15 +43,38 @@ HttpHead headOf(MHD_Connection* connection, const char* target, const char* meth
     return head;
 }
 
+/// Texts of the library with their lengths: a null byte may be decoded within one.
+MHD_Result addPair(void* pairs, MHD_ValueKind /*kind*/, const char* name, std::size_t nameSize,
+                   const char* value, std::size_t valueSize) {
+    static_cast<std::vector<std::pair<std::string, std::string>>*>(pairs)->emplace_back(
+        name == nullptr ? "" : std::string(name, nameSize),
+        value == nullptr ? "" : std::string(value, valueSize));
+    return MHD_YES;
+}
+
+PageRequest pageRequestOf(MHD_Connection* connection, const HttpHead& head) {
+    PageRequest request;
+    request.path = head.target;
+    MHD_get_connection_values_n(connection, MHD_GET_ARGUMENT_KIND, addPair, &request.arguments);
+    MHD_get_connection_values_n(connection, MHD_HEADER_KIND, addPair, &request.headers);
+    if (!request.arguments.empty()) {
+        request.path.pop_back();  // the sign in front of the query
+    }
+    request.arrived = Exchange::Clock::now();
+    return request;
+}
+
 }  // namespace
 
 class Server::Implementation {
   public:
-    Implementation(ObjectManager& manager, ServerSettings settings, ServerLog log)
-        : settings_(checked(std::move(settings))),
+    Implementation(ObjectManager* manager, PageHandler pages, ServerSettings settings,
+                   ServerLog log)
+        : pages_(std::move(pages)),
+          settings_(checked(std::move(settings))),
           log_(std::move(log)),
           connections_(settings_.limits.request, settings_.limits.response),
-          dispatcher_(manager, settings_, log_) {
+          dispatcher_(manager, pages_, settings_, log_, counts_) {
         try {
             start();
         } catch (const SocketError& error) {
@@ -77,12 +101,13 @@ class Server::Implementation {
     Implementation& operator=(const Implementation&) = delete;
 
     [[nodiscard]] std::uint16_t port() const noexcept { return port_; }
+    [[nodiscard]] const ServerCounts& counts() const noexcept { return counts_; }
 
     [[nodiscard]] std::string url() const {
         const bool six = settings_.address.find(':') != std::string::npos;
         return (settings_.tls ? "https://" : "http://") +
                (six ? '[' + settings_.address + ']' : settings_.address) + ':' +
-               std::to_string(port_) + "/cimom";
+               std::to_string(port_) + (pages_ ? "/" : "/cimom");
     }
 
   private:
@@ -180,9 +205,11 @@ class Server::Implementation {
                 MHD_get_connection_info(connection, MHD_CONNECTION_INFO_CONNECTION_FD);
             const auto* const client =
                 MHD_get_connection_info(connection, MHD_CONNECTION_INFO_CLIENT_ADDRESS);
+            server.counts_.connectionOpened();
             *context = server.connections_.opened(
                 socket->connect_fd, addressText(client == nullptr ? nullptr : client->client_addr));
         } else {
+            server.counts_.connectionClosed();
             server.connections_.closed(static_cast<Connections::Connection*>(*context));
             *context = nullptr;
         }
@@ -231,7 +258,13 @@ class Server::Implementation {
 
     MHD_Result begin(MHD_Connection* connection, Exchange& exchange, const HttpHead& head) {
         try {
-            exchange.headers = readHead(head, settings_.limits);
+            if (pages_) {
+                exchange.page = pageRequestOf(connection, head);
+                exchange.headers.emplace().authorization =
+                    checkPageRequest(head.method, head.version, *exchange.page, settings_.limits);
+            } else {
+                exchange.headers = readHead(head, settings_.limits);
+            }
             if (settings_.users && !exchange.headers->authorization) {
                 // Nothing of a stranger's body is kept.
                 exchange.early = HttpResponse::refusal();
@@ -241,7 +274,11 @@ class Server::Implementation {
             return MHD_YES;
         } catch (const HttpFailure& failure) {
             log_(LogKind::request, exchange.address() + ": " + failure.what());
-            return send(connection, exchange, HttpResponse::failure(failure));
+            HttpResponse refused = HttpResponse::failure(failure);
+            if (pages_) {
+                refused.allowed = "GET, HEAD";
+            }
+            return send(connection, exchange, std::move(refused));
         }
     }
 
@@ -288,6 +325,7 @@ class Server::Implementation {
     }
 
     MHD_Result send(MHD_Connection* connection, Exchange& exchange, HttpResponse response) {
+        counts_.responded(response.status);
         connections_.expectTaking(connectionOf(connection));
         const auto time = exchange.complete == Exchange::Clock::time_point()
                               ? Exchange::Clock::duration()
@@ -297,6 +335,8 @@ class Server::Implementation {
                             std::chrono::duration_cast<std::chrono::microseconds>(time));
     }
 
+    const PageHandler pages_;  ///< empty: CIM-XML is served
+    ServerCounts counts_;
     // Not constant, as the library takes its texts by pointers to plain char.
     ServerSettings settings_;
     std::string tlsPriorities_ = "NORMAL:-VERS-ALL:+VERS-TLS1.3:+VERS-TLS1.2";
@@ -313,13 +353,21 @@ class Server::Implementation {
 };
 
 Server::Server(ObjectManager& manager, ServerSettings settings, ServerLog log)
-    : implementation_(
-          std::make_unique<Implementation>(manager, std::move(settings), std::move(log))) {}
+    : implementation_(std::make_unique<Implementation>(&manager, nullptr, std::move(settings),
+                                                       std::move(log))) {}
+
+Server::Server(PageHandler pages, ServerSettings settings, ServerLog log)
+    : implementation_(std::make_unique<Implementation>(nullptr, std::move(pages),
+                                                       std::move(settings), std::move(log))) {}
 
 Server::~Server() = default;
 
 std::uint16_t Server::port() const noexcept {
     return implementation_->port();
+}
+
+const ServerCounts& Server::counts() const noexcept {
+    return implementation_->counts();
 }
 
 std::string Server::url() const {

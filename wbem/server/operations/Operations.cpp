@@ -28,6 +28,13 @@ const Table& table() {
     return all;
 }
 
+ResponseBody failed(const Call& call, unsigned status, const std::string& description) {
+    return ResponseBody(errorResponse(call, status, description), status);
+}
+ResponseBody failed(const Call& call, CimStatus status, const std::string& description) {
+    return failed(call, static_cast<unsigned>(status), description);
+}
+
 }  // namespace
 
 Operations::Operations(ObjectManager& manager, const Limits& limits, ModificationLog log)
@@ -36,13 +43,18 @@ Operations::Operations(ObjectManager& manager, const Limits& limits, Modificatio
       largestResult_(limits.result),
       log_(std::move(log)) {}
 
+std::string_view Operations::nameOf(const Call& call) {
+    const auto found = call.intrinsic ? table().find(call.method) : table().end();
+    return found == table().end() ? "other" : found->first;
+}
+
 ResponseBody Operations::perform(const Call& call, const Caller& caller) {
     const auto found = call.intrinsic ? table().find(call.method) : table().end();
     if (found == table().end()) {
         // Also for methods of classes, none of which this manager calls. Clients
         // fall back to other operations on this very status.
-        return ResponseBody(errorResponse(call, static_cast<unsigned>(CimStatus::notSupported),
-                                          "the operation " + call.method + " is not offered"));
+        return failed(call, CimStatus::notSupported,
+                      "the operation " + call.method + " is not offered");
     }
     try {
         Request request{manager_, sessions_, largestResult_, log_, call, caller, Parameters(call)};
@@ -50,16 +62,13 @@ ResponseBody Operations::perform(const Call& call, const Caller& caller) {
         requireNameSpace(request);
         return found->second(request);
     } catch (const CimError& error) {
-        return ResponseBody(errorResponse(call, error.code, error.what()));
+        return failed(call, error.code, error.what());
     } catch (const NotValid&) {
         throw;
     } catch (const std::bad_alloc&) {
-        return ResponseBody(errorResponse(call,
-                                          static_cast<unsigned>(CimStatus::serverLimitsExceeded),
-                                          "the server is out of memory"));
+        return failed(call, CimStatus::serverLimitsExceeded, "the server is out of memory");
     } catch (const std::exception& error) {
-        return ResponseBody(
-            errorResponse(call, static_cast<unsigned>(CimStatus::failed), error.what()));
+        return failed(call, CimStatus::failed, error.what());
     }
 }
 

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstddef>
+#include <string_view>
 
 #include "cimom/Forward.h"
 #include "cimxml/Call.h"
@@ -21,6 +22,9 @@ class Operations {
     /// Carries a call out. A CIM error becomes a response, too. Throws NotValid when a
     /// parameter's elements are not those of DSP0203.
     [[nodiscard]] ResponseBody perform(const Call& call, const Caller& caller);
+
+    /// The operation's name as the standard writes it; "other" for one that is not offered.
+    [[nodiscard]] static std::string_view nameOf(const Call& call);
 
     [[nodiscard]] EnumerationSessions& sessions() noexcept { return sessions_; }
 

@@ -15,7 +15,8 @@ class ResponseBody {
     using Items = std::function<bool(std::string&)>;
 
     /// A body that is at hand.
-    explicit ResponseBody(std::string whole) : head_(std::move(whole)) {}
+    explicit ResponseBody(std::string whole, unsigned status = 0)
+        : head_(std::move(whole)), status_(status) {}
     ResponseBody(std::string head, Items items, std::string tail)
         : head_(std::move(head)), items_(std::move(items)), tail_(std::move(tail)) {}
 
@@ -23,11 +24,14 @@ class ResponseBody {
     void write(std::string& out, std::size_t size);
     /// Whether the whole body has been written.
     [[nodiscard]] bool ended() const noexcept { return ended_; }
+    /// The CIM status that the body tells.
+    [[nodiscard]] unsigned status() const noexcept { return status_; }
 
   private:
     std::string head_;
     Items items_;
     std::string tail_;
+    unsigned status_ = 0;
     bool begun_ = false;
     bool ended_ = false;
 };

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstddef>
 #include <memory>
 
 #include "cimom/Forward.h"
@@ -26,6 +27,9 @@ class Subscriptions {
     ~Subscriptions();
     Subscriptions(const Subscriptions&) = delete;
     Subscriptions& operator=(const Subscriptions&) = delete;
+
+    /// How many subscriptions there are.
+    [[nodiscard]] std::size_t count() const;
 
   private:
     std::shared_ptr<SubscriptionStore> store_;

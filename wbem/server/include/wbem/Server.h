@@ -5,6 +5,8 @@
 #include <string>
 
 #include "cimom/Forward.h"
+#include "wbem/Metrics.h"
+#include "wbem/Pages.h"
 #include "wbem/ServerSettings.h"
 
 namespace cimom::wbem {
@@ -19,14 +21,18 @@ class Server {
   public:
     /// Listens from now on. Borrows the manager. Throws ServerError.
     Server(ObjectManager& manager, ServerSettings settings, ServerLog log);
+    /// Serves pages in place of CIM-XML, with the same limits and users. Throws ServerError.
+    Server(PageHandler pages, ServerSettings settings, ServerLog log);
     /// Responds with 503 to what is under way, and waits for operations that run.
     ~Server();
     Server(const Server&) = delete;
     Server& operator=(const Server&) = delete;
 
     [[nodiscard]] std::uint16_t port() const noexcept;
-    /// "http://127.0.0.1:5988/cimom"
+    /// "http://127.0.0.1:5988/cimom"; of a server of pages "http://127.0.0.1:5988/".
     [[nodiscard]] std::string url() const;
+    /// Lives as long as the server.
+    [[nodiscard]] const ServerCounts& counts() const noexcept;
 
   private:
     class Implementation;

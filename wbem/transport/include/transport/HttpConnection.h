@@ -1,6 +1,7 @@
 #pragma once
 
 #include <atomic>
+#include <chrono>
 #include <cstddef>
 #include <memory>
 #include <optional>
@@ -27,6 +28,9 @@ struct HttpSettings {
     std::optional<std::string> caCertificates;  ///< a PEM file; none: the system's
     bool insecure = false;                      ///< any server is trusted
     std::optional<UserAndPassword> credential;
+    /// For the connection to stand, with TLS: a machine that is off does not cost the time that
+    /// one which is busy may take.
+    std::chrono::milliseconds connectPatience{5000};
     std::size_t longestResponse = 16U << 20U;  ///< bytes of the body
     /// Requests end soon after it has become true. Borrowed; null: nothing does that.
     const std::atomic<bool>* interrupted = nullptr;

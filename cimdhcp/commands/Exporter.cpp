@@ -1,0 +1,455 @@
+#include <algorithm>
+#include <array>
+#include <atomic>
+#include <cerrno>
+#include <charconv>
+#include <chrono>
+#include <cmath>
+#include <csignal>
+#include <cstring>
+#include <mutex>
+#include <nlohmann/json.hpp>
+#include <optional>
+#include <ostream>
+#include <string_view>
+#include <utility>
+
+#include "cimom/Names.h"
+#include "cimxml/HttpStatus.h"
+#include "client/RemoteClient.h"
+#include "client/ServerUrl.h"
+#include "commands/Metrics.h"
+#include "commands/Overview.h"
+#include "commands/Serve.h"
+#include "commands/ServerAccess.h"
+#include "text/DisplayText.h"
+#include "text/Failure.h"
+#include "text/Times.h"
+#include "zrcommon/File.h"
+
+namespace cimdhcp {
+
+namespace {
+
+using cimom::wbem::LogKind;
+using cimom::wbem::MetricFamily;
+using cimom::wbem::Page;
+using cimom::wbem::PageRequest;
+using Milliseconds = std::chrono::milliseconds;
+using Seconds = std::chrono::duration<double>;
+namespace http = cimom::wbem::http;
+
+/// Where "*" stands in the host of a target: a byte that no text of UTF-8 has, and that is a
+/// letter of hosts to the reader of URLs.
+constexpr char anyText = '\xFF';
+/// Bytes of a server's response: what one probe may cost.
+constexpr std::size_t longestProbe = 1U << 20U;
+
+/// Whether the host is of the pattern, in which each "*" stands for at least one letter, digit
+/// or hyphen, but never for a dot: a pattern grants a level of names and nothing below it.
+bool matchesHost(std::string_view pattern, std::string_view host) {
+    const auto isOfLabel = [](char c) {
+        return (c >= '0' && c <= '9') || (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') ||
+               c == '-';
+    };
+    if (pattern.empty()) {
+        return host.empty();
+    }
+    if (pattern.front() != anyText) {
+        return !host.empty() && cimom::sameName(pattern.substr(0, 1), host.substr(0, 1)) &&
+               matchesHost(pattern.substr(1), host.substr(1));
+    }
+    for (std::size_t length = 1; length <= host.size() && isOfLabel(host[length - 1]); ++length) {
+        if (matchesHost(pattern.substr(1), host.substr(length))) {
+            return true;
+        }
+    }
+    return false;
+}
+
+/// Machines that may be probed, and how.
+struct ProbeTarget {
+    ServerUrl url;  ///< its host may have anyText
+    Options options;
+    Milliseconds timeout{};
+    std::optional<ServerAccess> access;  ///< borrows the options
+
+    [[nodiscard]] bool allows(const ServerUrl& asked) const {
+        return asked.encrypted == url.encrypted && asked.port == url.port &&
+               asked.path == url.path && matchesHost(url.host, asked.host);
+    }
+};
+
+/// What the file says. Its targets do not move.
+struct ExporterSettings {
+    std::vector<std::unique_ptr<ProbeTarget>> targets;
+    Milliseconds offset{};
+
+    /// The first one that allows it; null: none does.
+    [[nodiscard]] const ProbeTarget* find(const ServerUrl& asked) const {
+        const auto found = std::find_if(targets.begin(), targets.end(),
+                                        [&](const auto& each) { return each->allows(asked); });
+        return found == targets.end() ? nullptr : found->get();
+    }
+};
+
+/// Reads the configuration; each failure names the file.
+class ExporterFile {
+  public:
+    ExporterFile(std::string file, const Options& options, const std::atomic<bool>& ending)
+        : file_(std::move(file)), options_(options), ending_(ending) {}
+
+    [[nodiscard]] ExporterSettings read() const {
+        const auto text = ZR::File::read(file_);
+        if (!text) {
+            throw Failure(ExitStatus::notLoaded, printable(file_) + ": " + std::strerror(errno));
+        }
+        try {
+            return settingsFrom(nlohmann::json::parse(*text));
+        } catch (const nlohmann::json::exception& error) {
+            refuse(error.what());
+        }
+    }
+
+  private:
+    using Json = nlohmann::json;
+
+    [[noreturn]] void refuse(const std::string& reason) const {
+        throw Failure(ExitStatus::usage, printable(file_) + ": " + printable(reason));
+    }
+
+    /// What is said for all targets, or for one.
+    struct Said {
+        Options options;
+        Milliseconds timeout{10'000};
+    };
+
+    [[nodiscard]] Milliseconds seconds(const Json& value, const std::string& key) const {
+        constexpr double longest = 3600;
+        const double number = value.get<double>();
+        if (!(number > 0 && number <= longest)) {
+            refuse('"' + key + "\" is a number of seconds, above 0 and at most 3600");
+        }
+        return std::chrono::ceil<Milliseconds>(Seconds(number));
+    }
+
+    /// Whether the key is one of those that stand both for all and for one.
+    bool take(const std::string& key, const Json& value, Said& said) const {
+        if (key == "cacert") {
+            said.options.caCertificate = value.get<std::string>();
+        } else if (key == "credentials") {
+            said.options.credentials = value.get<std::string>();
+        } else if (key == "namespace") {
+            said.options.nameSpace = value.get<std::string>();
+        } else if (key == "timeout") {
+            said.timeout = seconds(value, key);
+        } else {
+            return false;
+        }
+        return true;
+    }
+
+    [[nodiscard]] ExporterSettings settingsFrom(const Json& whole) const {
+        if (!whole.is_object()) {
+            refuse("an object with \"targets\" is wanted");
+        }
+        ExporterSettings settings;
+        settings.offset = Milliseconds(500);
+        Said said;
+        said.options = options_;
+        const Json* targets = nullptr;
+        for (const auto& [key, value] : whole.items()) {
+            if (key == "targets" && value.is_array()) {
+                targets = &value;
+            } else if (key == "timeoutOffset") {
+                settings.offset = seconds(value, key);
+            } else if (!take(key, value, said)) {
+                refuse("\"" + key + "\" is not known here");
+            }
+        }
+        if (targets == nullptr || targets->empty()) {
+            refuse("\"targets\" is a list of at least one target");
+        }
+        for (const Json& each : *targets) {
+            settings.targets.push_back(targetFrom(each, said));
+        }
+        return settings;
+    }
+
+    [[nodiscard]] std::unique_ptr<ProbeTarget> targetFrom(const Json& entry, Said said) const {
+        std::string text;
+        if (entry.is_string()) {
+            text = entry.get<std::string>();
+        } else if (!entry.is_object()) {
+            refuse("a target is a text or an object");
+        } else {
+            for (const auto& [key, value] : entry.items()) {
+                if (key == "target") {
+                    text = value.get<std::string>();
+                } else if (!take(key, value, said)) {
+                    refuse("\"" + key + "\" is not known for a target");
+                }
+            }
+        }
+        auto target = std::make_unique<ProbeTarget>();
+        std::string url = text;
+        std::replace(url.begin(), url.end(), '*', anyText);
+        try {
+            target->url = readServerUrl(url);
+            target->timeout = said.timeout;
+            target->options = std::move(said.options);
+            target->access.emplace(target->options, ending_);
+        } catch (const Failure& failure) {
+            refuse("target \"" + text + "\": " + failure.what());
+        }
+        return target;
+    }
+
+    const std::string file_;
+    const Options& options_;
+    const std::atomic<bool>& ending_;
+};
+
+/// The value of the header by which Prometheus tells how long it waits.
+std::optional<Milliseconds> scrapeTimeout(const PageRequest& request) {
+    const std::string text = request.header("X-Prometheus-Scrape-Timeout-Seconds");
+    double number = 0;
+    const char* const end = text.data() + text.size();
+    const auto [stop, error] = std::from_chars(text.data(), end, number);
+    constexpr double longest = 86400;
+    const bool good = !text.empty() && error == std::errc() && stop == end && number > 0 &&
+                      number <= longest;  // "nan" is in no range
+    return good ? std::optional(std::chrono::floor<Milliseconds>(Seconds(number))) : std::nullopt;
+}
+
+class Exporter {
+  public:
+    Exporter(ExporterFile file, cimom::wbem::ServerLog log)
+        : file_(std::move(file)),
+          log_(std::move(log)),
+          settings_(std::make_shared<const ExporterSettings>(file_.read())) {
+        reloadTime_ = secondsNow();
+    }
+
+    Page page(const PageRequest& request) {
+        if (request.path == "/probe") {
+            return probe(request);
+        }
+        if (request.path == "/metrics") {
+            return metricsPage(own(), request);
+        }
+        if (request.path == "/-/healthy") {
+            return {http::ok, "Healthy\n"};
+        }
+        if (request.path == "/") {
+            return {http::ok,
+                    "Metrics of the DHCP clients of other machines.\n"
+                    "/probe?target=https://HOST  a machine, of those that the configuration "
+                    "allows\n/metrics  the exporter itself\n/-/healthy\n"};
+        }
+        return {http::notFound, "nothing is at this path\n"};
+    }
+
+    /// A file that cannot be used changes nothing.
+    void reload() {
+        bool good = true;
+        try {
+            auto settings = std::make_shared<const ExporterSettings>(file_.read());
+            const std::lock_guard lock(mutex_);
+            settings_.swap(settings);
+            reloadTime_ = secondsNow();
+        } catch (const Failure& failure) {
+            good = false;
+            log_(LogKind::failure, std::string("the configuration stays: ") + failure.what());
+        }
+        reloaded_ = good;
+        if (good) {
+            log_(LogKind::notice, "the configuration was read again");
+        }
+    }
+
+    [[nodiscard]] std::size_t targets() const { return settings()->targets.size(); }
+
+  private:
+    [[nodiscard]] std::shared_ptr<const ExporterSettings> settings() const {
+        const std::lock_guard lock(mutex_);
+        return settings_;
+    }
+
+    Page refuse(const char* reason) {
+        ++refused_;
+        return {http::badRequest, reason};
+    }
+
+    Page probe(const PageRequest& request) {
+        const std::string* asked = nullptr;
+        for (const auto& [name, value] : request.arguments) {
+            if (name == "target" && asked != nullptr) {
+                return refuse("target is given twice\n");
+            }
+            if (name == "target") {
+                asked = &value;
+            }
+        }
+        if (asked == nullptr || asked->empty()) {
+            return refuse("target is missing\n");
+        }
+        const auto settings = this->settings();
+        const ProbeTarget* target = nullptr;
+        ServerUrl url;
+        try {
+            url = readServerUrl(*asked);
+            // What is the sign of patterns is not a host, nor is what no name can be.
+            constexpr std::size_t longestName = 253;
+            const bool isName =
+                url.host.size() <= longestName && url.host.find(anyText) == std::string::npos;
+            target = isName ? settings->find(url) : nullptr;
+        } catch (const Failure&) {
+            // What is not a URL is not a target either; it is not repeated.
+        }
+        if (target == nullptr) {
+            return refuse("the configuration does not allow this target\n");
+        }
+        Milliseconds time = target->timeout;
+        if (const auto scraper = scrapeTimeout(request)) {
+            // With an offset that would leave nothing, half of it is better than none.
+            time = std::min(time, std::max(*scraper - settings->offset, *scraper / 2));
+        }
+        return metricsPage(ask(*target, url, request.arrived, time), request);
+    }
+
+    MetricFamilies ask(const ProbeTarget& target, const ServerUrl& url,
+                       std::chrono::steady_clock::time_point arrived, Milliseconds time) {
+        const auto now = [] { return std::chrono::steady_clock::now(); };
+        MetricFamilies families;
+        std::string reason;
+        try {
+            HttpSettings settings = target.access->settingsFor(url);
+            settings.longestResponse = longestProbe;
+            // What it has waited for its turn is gone.
+            const auto left = std::chrono::ceil<Milliseconds>(arrived + time - now());
+            RemoteClient client(url, std::move(settings), Deadline(left), target.options.nameSpace);
+            families = machineMetrics(askMachine(client, AskDiagnostics::Yes), secondsNow());
+        } catch (const Failure& failure) {
+            reason = failure.what();
+        } catch (const cimom::wbem::ConnectionError& error) {
+            reason = error.what();
+        }
+        const Seconds took = now() - arrived;
+        const bool success = reason.empty();
+        durations_.add(took);
+        ++(success ? succeeded_ : failed_);
+        if (!success) {
+            log_(LogKind::request, printable(url.text()) + ": " + printable(reason));
+        }
+        families.push_back({"probe_success",
+                            MetricFamily::Kind::gauge,
+                            "Whether the machine was asked and has responded.",
+                            "",
+                            {{{}, success ? 1.0 : 0.0, ""}}});
+        families.push_back({"probe_duration_seconds",
+                            MetricFamily::Kind::gauge,
+                            "How long the probe took.",
+                            "seconds",
+                            {{{}, took.count(), ""}}});
+        return families;
+    }
+
+    /// What is told of the exporter itself.
+    [[nodiscard]] MetricFamilies own() const {
+        const auto number = [](auto value) { return static_cast<double>(value); };
+        using Kind = MetricFamily::Kind;
+        MetricFamilies families;
+        const auto one = [&](const char* name, Kind kind, const char* help, const char* unit,
+                             double value) {
+            families.push_back({name, kind, help, unit, {{{}, value, ""}}});
+        };
+        families.push_back(buildInfo("cimdhcp_exporter"));
+        families.push_back({"cimdhcp_exporter_probes",
+                            Kind::counter,
+                            "Probes of machines, by how they ended.",
+                            "",
+                            {{{{"result", "success"}}, number(succeeded_.load()), ""},
+                             {{{"result", "failure"}}, number(failed_.load()), ""}}});
+        one("cimdhcp_exporter_refused_requests", Kind::counter,
+            "Requests for a target that the configuration does not allow.", "",
+            number(refused_.load()));
+        families.push_back({"cimdhcp_exporter_probe_duration_seconds", Kind::histogram,
+                            "How long probes took, with the wait for their turn.", "seconds",
+                            durations_.samples()});
+        one("cimdhcp_exporter_targets", Kind::gauge,
+            "Targets and patterns of targets in the configuration.", "", number(targets()));
+        one("cimdhcp_exporter_config_reload_successful", Kind::gauge,
+            "Whether the configuration could be read when it was last asked for.", "",
+            reloaded_ ? 1 : 0);
+        one("cimdhcp_exporter_config_reload_timestamp_seconds", Kind::gauge,
+            "When the configuration in use was read.", "seconds", number(reloadTime_.load()));
+        families.push_back(cimom::wbem::residentMemory("cimdhcp_exporter"));
+        return families;
+    }
+
+    const ExporterFile file_;
+    const cimom::wbem::ServerLog log_;
+    mutable std::mutex mutex_;  ///< of settings_
+    std::shared_ptr<const ExporterSettings> settings_;
+    cimom::wbem::DurationHistogram durations_;
+    std::atomic<std::uint64_t> succeeded_{0};
+    std::atomic<std::uint64_t> failed_{0};
+    std::atomic<std::uint64_t> refused_{0};
+    std::atomic<bool> reloaded_{true};
+    std::atomic<std::int64_t> reloadTime_{0};
+};
+
+/// The signals that the exporter waits for, blocked in all threads that start from now on.
+sigset_t blockExporterSignals() {
+    sigset_t signals;
+    sigemptyset(&signals);
+    for (const int signal : {SIGTERM, SIGINT, SIGHUP}) {
+        sigaddset(&signals, signal);
+    }
+    const int error = ::pthread_sigmask(SIG_BLOCK, &signals, nullptr);
+    if (error != 0) {
+        throw Failure(ExitStatus::notLoaded, std::strerror(error));
+    }
+    return signals;
+}
+
+}  // namespace
+
+void serveExporter(const ExporterCommand& command, const Options& options, std::ostream& out) {
+    std::atomic<bool> ending = false;
+    const auto log = serverLog();
+    Exporter exporter(ExporterFile(command.config, options, ending), log);
+    if (command.check) {
+        out << printable(command.config) << ": good, with " << exporter.targets()
+            << (exporter.targets() == 1 ? " target\n" : " targets\n");
+        return;
+    }
+    const sigset_t signals = blockExporterSignals();
+    try {
+        ServeCommand where = command.server;
+        where.limits.workers = options.parallel;
+        where.limits.stuck = 1;
+        constexpr std::uint16_t port = 9989;
+        cimom::wbem::ServerSettings settings = settingsOf(where);
+        settings.port = settings.port.value_or(port);
+        const cimom::wbem::Server server(
+            [&exporter](const PageRequest& request) { return exporter.page(request); },
+            std::move(settings), log);
+        out << "Listening on " << server.url() << std::endl;
+        int signal = 0;
+        while (::sigwait(&signals, &signal) != 0 || signal == SIGHUP) {
+            if (signal == SIGHUP) {
+                exporter.reload();
+            }
+            signal = 0;
+        }
+        ending = true;
+    } catch (const cimom::wbem::ServerError& error) {
+        throw Failure(ExitStatus::notLoaded, printable(error.what()));
+    } catch (const cimom::wbem::UsersError& error) {
+        throw Failure(ExitStatus::notLoaded, printable(error.what()));
+    }
+}
+
+}  // namespace cimdhcp

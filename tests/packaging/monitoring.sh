@@ -1,0 +1,201 @@
+#!/usr/bin/env bash
+# Runs the alerts' tests, and looks at a fleet as Prometheus does: a real one scrapes a server
+# with its metrics, this machine's own, and 200 machines through the exporter, all within one
+# interval; then each query of the dashboard has a result there.
+# Usage: monitoring.sh PROGRAM MONITORING_DIRECTORY TREE [ANSWERS]
+#   ANSWERS  a file for what Prometheus has responded, from which the page's picture is drawn
+set -euo pipefail
+
+program=$1
+monitoring=$2
+tree=$3
+answers=${4:-}
+directory=$(mktemp -d)
+pids=()
+# shellcheck disable=SC2317  # called by the trap
+cleanup() {
+    for pid in "${pids[@]}"; do
+        kill "$pid" 2>/dev/null || true
+        wait "$pid" 2>/dev/null || true
+    done
+    rm -rf "$directory"
+}
+trap cleanup EXIT
+fail() {
+    echo "FAILED: $*"
+    tail -n 20 "$directory"/*.log
+    exit 1
+}
+export ZR_LOG_SINK=none ZR_CONFIG=$directory/platform.conf STATE_DIRECTORY=$directory/state
+touch "$directory/platform.conf"
+
+echo "== alerts"
+promtool check rules "$monitoring/alerts.yml"
+promtool test rules "$monitoring/alerts_test.yml"
+# Each alert has a test in which it fires.
+while read -r alert; do
+    jq -Rse --arg alert "$alert" 'test("alertname: " + $alert + "\n *exp_alerts:\n")' \
+        "$monitoring/alerts_test.yml" >/dev/null || fail "no test lets $alert fire"
+done < <(sed -n 's/^ *- alert: //p' "$monitoring/alerts.yml")
+
+echo "== the fleet"
+cd "$directory"
+machines=200
+names=$(for ((number = 1; number <= machines; number++)); do printf ',IP:127.0.1.%d' "$number"; done)
+openssl req -x509 -newkey ec -pkeyopt ec_paramgen_curve:prime256v1 -nodes -days 2 -subj /CN=test \
+    -addext "subjectAltName=IP:127.0.0.1$names" -keyout key.pem -out ca.pem 2>/dev/null
+echo secret | "$program" user add --users users scraper >/dev/null
+# Leases as of now, all but the one without an end.
+jq --argjson now "$(date +%s)" \
+    'walk(if type == "object" and .type == "DHCPLease" and .properties.LeaseExpires < 253402300799
+          then .properties += {LeaseObtained: $now, RenewalTime: ($now + 1800),
+                               RebindingTime: ($now + 3150), LeaseExpires: ($now + 3600)}
+          else . end)' "$tree" >tree.json
+started() { # started NAME COMMAND...: prints where it listens
+    "${@:2}" >"$1.log" 2>&1 &
+    pids+=($!)
+    until grep -q '^Listening on ' "$1.log" && [[ $1 != *metrics || -n $(sed -n 2p "$1.log") ]]; do
+        kill -0 "$!" 2>/dev/null || fail "$1 has not started"
+        sleep 0.05
+    done
+}
+tls=(--tls-cert ca.pem --tls-key key.pem --users users)
+started fleet-metrics "$program" --tree tree.json serve --listen 0.0.0.0:0 --metrics 127.0.0.1:0 \
+    "${tls[@]}"
+port=$(sed -n 's#^Listening on https://0.0.0.0:\([0-9]*\)/cimom$#\1#p' fleet-metrics.log)
+direct=$(sed -n 's#^Metrics at https://\(.*\)/metrics$#\1#p' fleet-metrics.log)
+started own-metrics "$program" serve --listen 127.0.0.1:0 --metrics 127.0.0.1:0
+own=$(sed -n 's#^Metrics at http://\(.*\)/metrics$#\1#p' own-metrics.log)
+hosts=127.0.1.1
+for ((number = 2; number <= machines; number++)); do
+    hosts+=" 127.0.1.$number"
+done
+for host in $hosts; do
+    echo "machine $host login scraper password secret"
+done >credentials
+chmod 600 credentials
+jq -n --arg target "https://127.0.1.*:$port" --arg directory "$directory" \
+    '{cacert: ($directory + "/ca.pem"), credentials: ($directory + "/credentials"),
+      targets: [$target]}' >exporter.json
+"$program" exporter --check --config exporter.json
+started exporter "$program" exporter --config exporter.json --listen 127.0.0.1:0
+exporter=$(sed -n 's#^Listening on http://\(.*\)/$#\1#p' exporter.log)
+
+interval=15
+{
+    cat <<TEXT
+global: {scrape_interval: ${interval}s, scrape_timeout: ${interval}s, evaluation_interval: ${interval}s}
+rule_files: [$monitoring/alerts.yml]
+scrape_configs:
+  - job_name: dhcp-clients
+    metrics_path: /probe
+    static_configs:
+      - targets:
+TEXT
+    for host in $hosts; do
+        echo "          - https://$host:$port"
+    done
+    cat <<TEXT
+    relabel_configs:
+      - {source_labels: [__address__], target_label: __param_target}
+      - {source_labels: [__param_target], target_label: instance}
+      - {target_label: __address__, replacement: '$exporter'}
+  - job_name: dhcp-exporter
+    static_configs: [{targets: ['$exporter']}]
+  - job_name: dhcp-clients-direct
+    scheme: https
+    tls_config: {ca_file: ca.pem}
+    basic_auth: {username: scraper, password: secret}
+    static_configs: [{targets: ['$direct']}]
+  - job_name: dhcp-clients-own
+    static_configs: [{targets: ['$own']}]
+TEXT
+} >prometheus.yml
+promtool check config prometheus.yml >/dev/null || fail "the configuration of Prometheus"
+free=$(python3 -c 'import socket; s = socket.socket(); s.bind(("127.0.0.1", 0)); print(s.getsockname()[1])')
+prometheus --config.file=prometheus.yml --storage.tsdb.path=data --log.level=warn \
+    --web.listen-address="127.0.0.1:$free" >prometheus.log 2>&1 &
+pids+=($!)
+query() { # query EXPRESSION: the result as JSON
+    curl --silent --fail-with-body --get --data-urlencode "query=$1" \
+        "http://127.0.0.1:$free/api/v1/query"
+}
+value() { query "$1" 2>/dev/null | jq -r '.data.result[0].value[1] // "0"' 2>/dev/null || echo 0; }
+# Prometheus spreads targets over the interval: all have been asked for when two are over.
+patience=$((SECONDS + 120))
+until [[ $(value 'count(count_over_time(up[1h]) >= 2)') == $((machines + 3)) ]]; do
+    kill -0 "${pids[-1]}" 2>/dev/null || fail "Prometheus has ended"
+    ((SECONDS < patience)) || fail "not all was scraped: $(query 'count by (job) (up)')"
+    sleep 0.5
+done
+expect() { # expect EXPRESSION: it holds
+    [[ $(query "$1" | jq '.data.result | length') -gt 0 ]] ||
+        fail "not so: $1: $(query "${1%% [<>=]*}")"
+    echo "ok: $1"
+}
+expect "count(probe_success == 1) == $machines"
+expect "sum(up) == $machines + 3"
+expect "max(scrape_duration_seconds) < $interval"
+expect 'cimdhcp_exporter_resident_memory_bytes < 64 * 1024 * 1024'
+expect 'count(dhcp_client_state{state="bound", interface="eth0"} == 1) >= 200'
+echo "exporter: $(value cimdhcp_exporter_resident_memory_bytes) bytes," \
+    "longest probe $(value 'max(probe_duration_seconds)') s"
+
+echo "== the dashboard"
+python3 - "$monitoring/dashboard.json" "http://127.0.0.1:$free" "$answers" <<'PYTHON'
+import json
+import sys
+import urllib.parse
+import urllib.request
+
+dashboard, prometheus, answers = sys.argv[1:]
+board = json.load(open(dashboard))
+source = {"type": "prometheus", "uid": "${datasource}"}
+failures, kept = [], {}
+
+
+def ask(expression):
+    url = prometheus + "/api/v1/query?" + urllib.parse.urlencode({"query": expression})
+    with urllib.request.urlopen(url) as response:
+        return json.load(response)["data"]["result"]
+
+
+def overlap(one, other):
+    a, b = one["gridPos"], other["gridPos"]
+    return (a["x"] < b["x"] + b["w"] and b["x"] < a["x"] + a["w"]
+            and a["y"] < b["y"] + b["h"] and b["y"] < a["y"] + a["h"])
+
+
+panels = board["panels"]
+if len({panel["id"] for panel in panels}) != len(panels):
+    failures.append("two panels have one id")
+for index, panel in enumerate(panels):
+    failures += [f"{panel['title']} lies over {other['title']}"
+                 for other in panels[:index] if overlap(panel, other)]
+    if panel["type"] == "row":
+        continue
+    if not (panel["description"] and panel["fieldConfig"]["defaults"]["unit"]):
+        failures.append(f"{panel['title']}: no description or unit")
+    for target in panel["targets"]:
+        if target["datasource"] != source or panel["datasource"] != source:
+            failures.append(f"{panel['title']}: another source")
+        expression = target["expr"].replace("$job", "dhcp-clients.*").replace("$instance", ".+")
+        expression = expression.replace("$__rate_interval", "1m")
+        try:
+            result = ask(expression)
+        except urllib.error.HTTPError as error:
+            failures.append(f"{panel['title']}: {error.read().decode()}")
+            continue
+        kept.setdefault(panel["title"], []).append(result)
+        if "$" in expression or not result:
+            failures.append(f"{panel['title']}: nothing for {expression}")
+for variable in board["templating"]["list"][1:]:
+    expression = variable["definition"].removeprefix("label_values(").rsplit(",", 1)[0]
+    if not ask(expression.replace("$job", ".*")):
+        failures.append(f"variable {variable['name']}: nothing")
+if answers:
+    json.dump(kept, open(answers, "w"), indent=1)
+print(f"{sum(map(len, kept.values()))} queries")
+print("\n".join("FAILED: " + each for each in failures))
+sys.exit(bool(failures))
+PYTHON

@@ -1,0 +1,34 @@
+#pragma once
+
+#include <chrono>
+#include <functional>
+#include <string>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+namespace cimom::wbem {
+
+/// A page that a client asks for with GET or HEAD.
+struct PageRequest {
+    std::string path;
+    /// Of the query, decoded, in their order.
+    std::vector<std::pair<std::string, std::string>> arguments;
+    std::vector<std::pair<std::string, std::string>> headers;
+    std::chrono::steady_clock::time_point arrived{};
+
+    /// The values of all headers of that name, with commas between them; empty: there is none.
+    [[nodiscard]] std::string header(std::string_view name) const;
+};
+
+struct Page {
+    unsigned status = 200;
+    std::string text;
+    std::string contentType = "text/plain; charset=utf-8";
+};
+
+/// Makes the pages of a server. Called by several threads at once; what it throws becomes
+/// a response with status 500.
+using PageHandler = std::function<Page(const PageRequest&)>;
+
+}  // namespace cimom::wbem
