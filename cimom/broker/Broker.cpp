@@ -6,7 +6,7 @@
 
 #include "broker/BrokerTables.h"
 #include "broker/RequestScope.h"
-#include "broker/objects/BrokerContext.h"
+#include "broker/objects/BrokerRecords.h"
 
 namespace cimom::broker {
 

@@ -2,7 +2,7 @@
 
 #include "broker/Conversion.h"
 #include "broker/RequestScope.h"
-#include "broker/objects/BrokerObjectPath.h"
+#include "broker/objects/BrokerRecords.h"
 #include "broker/objects/BrokerStatus.h"
 #include "cimom/ClassDeclaration.h"
 #include "cimom/ClassRepository.h"

@@ -2,7 +2,7 @@
 
 #include <cmpift.h>
 
-#include "broker/objects/BrokerObjectPath.h"
+#include "broker/objects/BrokerRecords.h"
 
 namespace cimom::broker {
 

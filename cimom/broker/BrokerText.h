@@ -6,7 +6,7 @@
 #include <string>
 #include <string_view>
 
-#include "broker/objects/BrokerObjectPath.h"
+#include "broker/objects/BrokerRecords.h"
 
 namespace cimom::broker {
 

@@ -6,10 +6,7 @@
 #include <utility>
 
 #include "broker/BrokerTypes.h"
-#include "broker/objects/BrokerArray.h"
-#include "broker/objects/BrokerDateTime.h"
-#include "broker/objects/BrokerInstance.h"
-#include "broker/objects/BrokerObjectPath.h"
+#include "broker/objects/BrokerRecords.h"
 #include "cimom/Instance.h"
 
 namespace cimom::broker {

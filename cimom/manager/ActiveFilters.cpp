@@ -6,9 +6,7 @@
 
 #include "broker/Broker.h"
 #include "broker/RequestScope.h"
-#include "broker/objects/BrokerContext.h"
-#include "broker/objects/BrokerObjectPath.h"
-#include "broker/objects/BrokerSelectExp.h"
+#include "broker/objects/BrokerRecords.h"
 #include "cimom/ClassDeclaration.h"
 #include "cimom/ClassRepository.h"
 #include "cimom/Names.h"

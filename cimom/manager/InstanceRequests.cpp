@@ -1,7 +1,7 @@
 // Requests about instances: which providers are asked, and how.
 #include <algorithm>
 
-#include "broker/objects/BrokerInstance.h"
+#include "broker/objects/BrokerRecords.h"
 #include "cimom/ClassDeclaration.h"
 #include "cimom/Query.h"
 #include "manager/ObjectManagerImplementation.h"

@@ -6,7 +6,7 @@
 #include <utility>
 
 #include "broker/RequestScope.h"
-#include "broker/objects/BrokerContext.h"
+#include "broker/objects/BrokerRecords.h"
 #include "cimom/Registrations.h"
 #include "manager/GuardedCall.h"
 

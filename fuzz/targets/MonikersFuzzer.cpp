@@ -6,7 +6,7 @@
 #include "broker/Broker.h"
 #include "broker/Conversion.h"
 #include "broker/RequestScope.h"
-#include "broker/objects/BrokerObjectPath.h"
+#include "broker/objects/BrokerRecords.h"
 #include "cimom/ClassRepository.h"
 #include "cimom/Names.h"
 #include "cimom/ObjectPathText.h"

@@ -6,7 +6,7 @@
 #include "Input.h"
 #include "formats/NetworkFile.h"
 #include "formats/NetworkdLease.h"
-#include "formats/TimeSpan.h"
+#include "formats/ValueFormats.h"
 #include "support/Addresses.h"
 
 namespace {

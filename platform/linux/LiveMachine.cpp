@@ -13,7 +13,6 @@
 #include "StateReaders.h"
 #include "clients/Processes.h"
 #include "formats/Files.h"
-#include "formats/SystemErrors.h"
 #include "ipmi/IpmiDevice.h"
 #include "tklogger/TKLogger.h"
 #include "zrclient/InstrumentationService.h"

@@ -14,7 +14,7 @@
 #include "Unannounced.h"
 #include "clients/ManagerBuses.h"
 #include "clients/ManagerSignals.h"
-#include "formats/Roots.h"
+#include "formats/Files.h"
 #include "ipmi/IpmiReader.h"
 #include "kernel/ChangeMonitor.h"
 #include "kernel/NetlinkTransport.h"

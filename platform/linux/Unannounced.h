@@ -5,7 +5,7 @@
 #include <vector>
 
 #include "facts/ClientFacts.h"
-#include "formats/Roots.h"
+#include "formats/Files.h"
 #include "kernel/Sockets.h"
 
 namespace ZR::Live {

@@ -1,6 +1,6 @@
 #include "kit/Host.h"
 
-#include "broker/objects/BrokerInstance.h"
+#include "broker/objects/BrokerRecords.h"
 #include "cimom/Instance.h"
 
 namespace test {

@@ -13,7 +13,7 @@
 
 #include "broker/Conversion.h"
 #include "broker/RequestScope.h"
-#include "broker/objects/BrokerInstance.h"
+#include "broker/objects/BrokerRecords.h"
 #include "cimom/ObjectPathText.h"
 #include "cimom/Results.h"
 #include "manager/ProviderCall.h"

@@ -1,4 +1,4 @@
-#include "broker/objects/BrokerArray.h"
+#include "broker/objects/BrokerRecords.h"
 
 #include "broker/BrokerTypes.h"
 #include "broker/objects/BrokerStatus.h"

@@ -1,4 +1,4 @@
-#include "broker/objects/BrokerDateTime.h"
+#include "broker/objects/BrokerRecords.h"
 
 #include <chrono>
 

@@ -1,4 +1,4 @@
-#include "broker/objects/BrokerEnumeration.h"
+#include "broker/objects/BrokerRecords.h"
 
 #include "broker/objects/BrokerStatus.h"
 #include "cimom/Status.h"

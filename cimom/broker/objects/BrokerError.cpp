@@ -1,4 +1,4 @@
-#include "broker/objects/BrokerError.h"
+#include "broker/objects/BrokerRecords.h"
 
 #include "broker/objects/BrokerStatus.h"
 

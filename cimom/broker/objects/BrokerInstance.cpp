@@ -1,4 +1,4 @@
-#include "broker/objects/BrokerInstance.h"
+#include "broker/objects/BrokerRecords.h"
 
 #include <algorithm>
 #include <vector>

@@ -1,4 +1,4 @@
-#include "broker/objects/BrokerObjectPath.h"
+#include "broker/objects/BrokerRecords.h"
 
 #include "broker/BrokerQualifiers.h"
 #include "broker/BrokerText.h"

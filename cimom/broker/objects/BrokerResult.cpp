@@ -4,9 +4,7 @@
 
 #include "broker/BrokerTypes.h"
 #include "broker/Conversion.h"
-#include "broker/objects/BrokerError.h"
-#include "broker/objects/BrokerInstance.h"
-#include "broker/objects/BrokerObjectPath.h"
+#include "broker/objects/BrokerRecords.h"
 #include "broker/objects/BrokerStatus.h"
 #include "cimom/Instance.h"
 

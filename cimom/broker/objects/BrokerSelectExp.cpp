@@ -1,7 +1,6 @@
-#include "broker/objects/BrokerSelectExp.h"
+#include "broker/objects/BrokerRecords.h"
 
 #include "broker/Conversion.h"
-#include "broker/objects/BrokerInstance.h"
 #include "broker/objects/BrokerStatus.h"
 #include "cimom/ClassRepository.h"
 #include "cimom/Instance.h"

@@ -3,10 +3,7 @@
 #include <algorithm>
 
 #include "broker/BrokerTypes.h"
-#include "broker/objects/BrokerArray.h"
-#include "broker/objects/BrokerDateTime.h"
-#include "broker/objects/BrokerInstance.h"
-#include "broker/objects/BrokerObjectPath.h"
+#include "broker/objects/BrokerRecords.h"
 #include "broker/objects/BrokerStatus.h"
 
 namespace cimom::broker {

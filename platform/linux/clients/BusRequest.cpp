@@ -6,7 +6,7 @@
 #include <string_view>
 #include <utility>
 
-#include "formats/SystemErrors.h"
+#include "formats/Files.h"
 
 namespace ZR::Live {
 namespace {

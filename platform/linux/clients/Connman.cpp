@@ -5,7 +5,7 @@
 #include <cstddef>
 #include <utility>
 
-#include "clients/Managers.h"
+#include "facts/ClientFacts.h"
 #include "formats/Files.h"
 #include "formats/KeyFile.h"
 #include "formats/Trust.h"

@@ -6,8 +6,8 @@
 
 #include "facts/ClientFacts.h"
 #include "facts/NamePatterns.h"
+#include "formats/Files.h"
 #include "formats/IpAddress.h"
-#include "formats/Roots.h"
 
 namespace ZR::Live {
 

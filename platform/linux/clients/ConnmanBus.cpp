@@ -5,7 +5,7 @@
 #include <utility>
 
 #include "clients/JsonValues.h"
-#include "clients/Managers.h"
+#include "facts/ClientFacts.h"
 #include "formats/InterfaceName.h"
 
 namespace ZR::Live {

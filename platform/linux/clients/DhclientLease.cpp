@@ -10,7 +10,7 @@
 #include <utility>
 
 #include "facts/Lease.h"
-#include "formats/Numbers.h"
+#include "formats/ValueFormats.h"
 
 namespace ZR::Live {
 namespace {

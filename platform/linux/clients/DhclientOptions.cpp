@@ -4,7 +4,7 @@
 #include <array>
 #include <span>
 
-#include "formats/Numbers.h"
+#include "formats/ValueFormats.h"
 
 namespace ZR::Live {
 namespace {

@@ -13,8 +13,8 @@
 #include "clients/DhcpcdSettings.h"
 #include "formats/DhcpPacket.h"
 #include "formats/Files.h"
-#include "formats/Numbers.h"
 #include "formats/Trust.h"
+#include "formats/ValueFormats.h"
 #include "zrcommon/File.h"
 
 namespace ZR::Live {

@@ -7,8 +7,8 @@
 #include <vector>
 
 #include "facts/ClientFacts.h"
+#include "formats/Files.h"
 #include "formats/InterfaceName.h"
-#include "formats/Roots.h"
 
 namespace ZR::Live {
 

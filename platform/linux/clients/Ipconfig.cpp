@@ -7,9 +7,9 @@
 #include <vector>
 
 #include "formats/Files.h"
-#include "formats/Numbers.h"
 #include "formats/ShellAssignments.h"
 #include "formats/Trust.h"
+#include "formats/ValueFormats.h"
 
 namespace ZR::Live {
 namespace {

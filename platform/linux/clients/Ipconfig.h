@@ -5,9 +5,9 @@
 #include <string_view>
 
 #include "facts/ClientFacts.h"
+#include "formats/Files.h"
 #include "formats/InterfaceName.h"
 #include "formats/IpAddress.h"
-#include "formats/Roots.h"
 
 namespace ZR::Live {
 

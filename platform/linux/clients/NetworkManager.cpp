@@ -6,12 +6,12 @@
 #include <cstddef>
 #include <utility>
 
-#include "clients/Managers.h"
+#include "facts/ClientFacts.h"
 #include "formats/Files.h"
 #include "formats/KeyFile.h"
 #include "formats/NetworkdLease.h"
-#include "formats/Numbers.h"
 #include "formats/Trust.h"
+#include "formats/ValueFormats.h"
 
 namespace ZR::Live {
 namespace {

@@ -9,9 +9,9 @@
 
 #include "clients/NetworkManagerLease.h"
 #include "facts/ClientFacts.h"
+#include "formats/Files.h"
 #include "formats/InterfaceName.h"
 #include "formats/IpAddress.h"
-#include "formats/Roots.h"
 
 namespace ZR::Live {
 

@@ -6,9 +6,9 @@
 #include <vector>
 
 #include "clients/JsonValues.h"
-#include "clients/Managers.h"
 #include "clients/NetworkManager.h"
 #include "clients/NetworkManagerLease.h"
+#include "facts/ClientFacts.h"
 
 namespace ZR::Live {
 namespace {

@@ -7,7 +7,7 @@
 #include <string_view>
 
 #include "clients/DhclientLease.h"
-#include "formats/Numbers.h"
+#include "formats/ValueFormats.h"
 
 namespace ZR::Live {
 namespace {

@@ -10,13 +10,12 @@
 #include <utility>
 #include <vector>
 
-#include "clients/Managers.h"
+#include "facts/ClientFacts.h"
 #include "formats/Files.h"
 #include "formats/NetworkFile.h"
 #include "formats/NetworkdLease.h"
-#include "formats/Numbers.h"
-#include "formats/TimeSpan.h"
 #include "formats/Trust.h"
+#include "formats/ValueFormats.h"
 #include "zrcommon/PropertyFile.h"
 
 namespace ZR::Live {

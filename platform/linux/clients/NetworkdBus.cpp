@@ -9,8 +9,8 @@
 #include <utility>
 
 #include "clients/JsonValues.h"
-#include "clients/Managers.h"
-#include "formats/Hexadecimal.h"
+#include "facts/ClientFacts.h"
+#include "formats/ValueFormats.h"
 
 namespace ZR::Live {
 namespace {

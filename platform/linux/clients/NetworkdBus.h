@@ -9,7 +9,7 @@
 #include "clients/BusRequest.h"
 #include "facts/ClientFacts.h"
 #include "formats/IpAddress.h"
-#include "formats/Parsed.h"
+#include "formats/ValueFormats.h"
 
 namespace ZR::Live {
 

@@ -9,9 +9,7 @@
 #include <cstddef>
 #include <string>
 
-#include "formats/Directory.h"
 #include "formats/Files.h"
-#include "formats/SystemErrors.h"
 
 namespace ZR::Live {
 namespace {

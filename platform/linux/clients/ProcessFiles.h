@@ -6,7 +6,7 @@
 #include <vector>
 
 #include "facts/RunningPrograms.h"
-#include "formats/Roots.h"
+#include "formats/Files.h"
 #include "zrclient/Diagnostic.h"
 
 namespace ZR::Live {

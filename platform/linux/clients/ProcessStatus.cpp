@@ -3,7 +3,7 @@
 #include <algorithm>
 #include <cstddef>
 
-#include "formats/Numbers.h"
+#include "formats/ValueFormats.h"
 
 namespace ZR::Live {
 namespace {

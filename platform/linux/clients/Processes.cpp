@@ -24,11 +24,9 @@
 #include "clients/Dhcpcd.h"
 #include "clients/ProcessStatus.h"
 #include "clients/Udhcpc.h"
-#include "formats/Directory.h"
 #include "formats/Files.h"
-#include "formats/Numbers.h"
-#include "formats/SystemErrors.h"
 #include "formats/Trust.h"
+#include "formats/ValueFormats.h"
 #include "kernel/Sockets.h"
 #include "zrcommon/UniqueFd.h"
 

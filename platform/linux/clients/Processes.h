@@ -1,7 +1,7 @@
 #pragma once
 
 #include "facts/ClientFacts.h"
-#include "formats/Roots.h"
+#include "formats/Files.h"
 
 namespace ZR::Live {
 

@@ -10,10 +10,10 @@
 #include <vector>
 
 #include "formats/Files.h"
-#include "formats/Numbers.h"
 #include "formats/OptionWalk.h"
 #include "formats/ShellAssignments.h"
 #include "formats/Trust.h"
+#include "formats/ValueFormats.h"
 
 namespace ZR::Live {
 namespace {

@@ -7,11 +7,11 @@
 #include <utility>
 #include <variant>
 
-#include "clients/Managers.h"
+#include "facts/ClientFacts.h"
 #include "formats/Files.h"
 #include "formats/InterfaceName.h"
-#include "formats/Numbers.h"
 #include "formats/Trust.h"
+#include "formats/ValueFormats.h"
 #include "zrcommon/Strings.h"
 
 namespace ZR::Live {

@@ -8,9 +8,9 @@
 #include <vector>
 
 #include "facts/ClientFacts.h"
+#include "formats/Files.h"
 #include "formats/IpAddress.h"
-#include "formats/Parsed.h"
-#include "formats/Roots.h"
+#include "formats/ValueFormats.h"
 
 namespace ZR::Live {
 

@@ -6,8 +6,8 @@
 #include <vector>
 
 #include "facts/ClientFacts.h"
+#include "formats/Files.h"
 #include "formats/IpAddress.h"
-#include "formats/Roots.h"
 #include "zrcommon/InterfaceFile.h"
 
 namespace ZR::Live {

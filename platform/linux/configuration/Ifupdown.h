@@ -6,9 +6,9 @@
 #include <vector>
 
 #include "facts/ClientFacts.h"
+#include "formats/Files.h"
 #include "formats/InterfaceName.h"
 #include "formats/IpAddress.h"
-#include "formats/Roots.h"
 
 namespace ZR::Live {
 

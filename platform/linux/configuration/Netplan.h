@@ -3,7 +3,7 @@
 #include <string_view>
 
 #include "facts/ClientFacts.h"
-#include "formats/Roots.h"
+#include "formats/Files.h"
 
 namespace ZR::Live {
 

@@ -17,4 +17,12 @@ bool ClientFacts::runsElsewhere(Client client) const noexcept {
            });
 }
 
+std::int32_t pidOfManager(const ClientFacts& facts, Client client) {
+    const auto found = std::find_if(
+        facts.managers.begin(), facts.managers.end(), [&](const ManagerProcess& manager) {
+            return manager.client == client && manager.where != ManagerProcess::Where::Elsewhere;
+        });
+    return found == facts.managers.end() ? 0 : found->pid;
+}
+
 }  // namespace ZR::Live

@@ -46,4 +46,7 @@ struct ClientFacts {
     bool operator==(const ClientFacts&) const = default;
 };
 
+/// The process number of a manager that runs for this network namespace; 0 for none.
+[[nodiscard]] std::int32_t pidOfManager(const ClientFacts& facts, Client client);
+
 }  // namespace ZR::Live

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <algorithm>
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -23,7 +24,10 @@ struct ClientProcess {
     std::optional<std::vector<std::uint32_t>> heardLinks{};
 
     /// Whether it was told to serve this interface, or all.
-    [[nodiscard]] bool serves(const InterfaceName& interface) const noexcept;
+    [[nodiscard]] bool serves(const InterfaceName& interface) const noexcept {
+        return interfaces.empty() ||
+               std::find(interfaces.begin(), interfaces.end(), interface) != interfaces.end();
+    }
 
     bool operator==(const ClientProcess&) const = default;
 };

@@ -8,7 +8,7 @@
 #include <tuple>
 #include <utility>
 
-#include "formats/Hexadecimal.h"
+#include "formats/ValueFormats.h"
 
 namespace ZR::Live {
 namespace {

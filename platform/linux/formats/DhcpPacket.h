@@ -8,7 +8,7 @@
 #include <vector>
 
 #include "formats/IpAddress.h"
-#include "formats/Parsed.h"
+#include "formats/ValueFormats.h"
 
 namespace ZR::Live {
 

@@ -4,8 +4,6 @@
 #include <cerrno>
 #include <cstddef>
 
-#include "formats/Directory.h"
-#include "formats/SystemErrors.h"
 #include "zrcommon/File.h"
 
 namespace ZR::Live {

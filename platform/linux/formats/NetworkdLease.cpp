@@ -4,7 +4,7 @@
 #include <array>
 #include <utility>
 
-#include "formats/TimeSpan.h"
+#include "formats/ValueFormats.h"
 #include "zrcommon/PropertyFile.h"
 
 namespace ZR::Live {

@@ -9,7 +9,6 @@
 #include <cstddef>
 
 #include "formats/Files.h"
-#include "formats/SystemErrors.h"
 
 namespace ZR::Live {
 namespace {

@@ -5,7 +5,7 @@
 #include <utility>
 #include <variant>
 
-#include "formats/SystemErrors.h"
+#include "formats/Files.h"
 
 namespace ZR::Live {
 namespace {

@@ -10,7 +10,7 @@
 #include <utility>
 #include <vector>
 
-#include "formats/SystemErrors.h"
+#include "formats/Files.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace ZR::Live {

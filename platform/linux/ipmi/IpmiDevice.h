@@ -4,7 +4,7 @@
 #include <memory>
 #include <string_view>
 
-#include "formats/Roots.h"
+#include "formats/Files.h"
 #include "ipmi/IpmiTransport.h"
 
 namespace ZR::Live {

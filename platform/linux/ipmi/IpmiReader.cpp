@@ -5,7 +5,7 @@
 #include <iterator>
 #include <utility>
 
-#include "formats/SystemErrors.h"
+#include "formats/Files.h"
 
 namespace ZR::Live {
 

@@ -18,7 +18,7 @@
 #include <functional>
 #include <utility>
 
-#include "formats/SystemErrors.h"
+#include "formats/Files.h"
 
 namespace ZR::Live {
 namespace {

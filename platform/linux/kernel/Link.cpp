@@ -5,7 +5,7 @@
 #include <linux/netlink.h>
 #include <linux/rtnetlink.h>
 
-#include "formats/Hexadecimal.h"
+#include "formats/ValueFormats.h"
 #include "kernel/Attributes.h"
 
 namespace ZR::Live {

@@ -13,7 +13,7 @@
 #include <span>
 #include <utility>
 
-#include "formats/SystemErrors.h"
+#include "formats/Files.h"
 #include "kernel/Attributes.h"
 
 namespace ZR::Live {

@@ -12,8 +12,8 @@
 #include <string>
 
 #include "formats/Files.h"
-#include "formats/Numbers.h"
 #include "formats/Trust.h"
+#include "formats/ValueFormats.h"
 
 namespace ZR::Live {
 namespace {

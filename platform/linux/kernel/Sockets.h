@@ -9,8 +9,8 @@
 #include <string_view>
 #include <vector>
 
+#include "formats/Files.h"
 #include "formats/IpAddress.h"
-#include "formats/Roots.h"
 #include "zrclient/Diagnostic.h"
 
 namespace ZR::Live {

@@ -2,8 +2,7 @@
 
 #include <limits>
 
-#include "broker/objects/BrokerInstance.h"
-#include "broker/objects/BrokerObjectPath.h"
+#include "broker/objects/BrokerRecords.h"
 #include "cimom/Instance.h"
 #include "kit/BrokerFixture.h"
 

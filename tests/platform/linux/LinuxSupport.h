@@ -19,9 +19,9 @@
 #include <vector>
 
 #include "facts/ClientFacts.h"
+#include "formats/Files.h"
 #include "formats/InterfaceName.h"
 #include "formats/IpAddress.h"
-#include "formats/Roots.h"
 #include "kit/TemporaryDirectory.h"
 #include "zrclient/Snapshot.h"
 #include "zrcommon/File.h"

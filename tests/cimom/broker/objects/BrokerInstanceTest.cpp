@@ -1,7 +1,6 @@
 #include <array>
 
-#include "broker/objects/BrokerInstance.h"
-#include "broker/objects/BrokerObjectPath.h"
+#include "broker/objects/BrokerRecords.h"
 #include "kit/BrokerFixture.h"
 
 namespace cimom::test {

@@ -1,4 +1,4 @@
-#include "broker/objects/BrokerArray.h"
+#include "broker/objects/BrokerRecords.h"
 #include "broker/objects/BrokerString.h"
 #include "broker/objects/BrokerValues.h"
 #include "kit/BrokerFixture.h"

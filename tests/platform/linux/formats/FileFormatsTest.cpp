@@ -12,7 +12,7 @@
 #include "formats/NetworkdLease.h"
 #include "formats/OptionWalk.h"
 #include "formats/ShellAssignments.h"
-#include "formats/TimeSpan.h"
+#include "formats/ValueFormats.h"
 
 namespace ZR::Live {
 namespace {

@@ -10,8 +10,7 @@
 #include "LinuxSupport.h"
 #include "formats/InterfaceName.h"
 #include "formats/IpAddress.h"
-#include "formats/Numbers.h"
-#include "formats/TimeSpan.h"
+#include "formats/ValueFormats.h"
 
 namespace ZR::Live {
 namespace {

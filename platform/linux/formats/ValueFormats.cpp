@@ -1,10 +1,9 @@
-#include "formats/TimeSpan.h"
+#include "formats/ValueFormats.h"
 
 #include <algorithm>
 #include <array>
 #include <cstddef>
 
-#include "formats/Numbers.h"
 #include "zrcommon/Strings.h"
 
 namespace ZR::Live {
