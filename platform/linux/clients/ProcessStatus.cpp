@@ -9,7 +9,7 @@ namespace ZR::Live {
 namespace {
 
 constexpr std::string_view blanks = " \t";
-constexpr int hexadecimal = 16;
+constexpr int hexadecimalBase = 16;
 
 /// Takes the next word off a text.
 std::string_view nextWord(std::string_view& text) {
@@ -41,7 +41,7 @@ std::optional<ProcessStatus> parseProcessStatus(std::string_view text) {
             status.realUser = real.value_or(0);
             status.user = effective.value_or(0);
         } else if (key == "CapEff:") {
-            status.capabilities = parseNumber<std::uint64_t>(value, hexadecimal).value_or(0);
+            status.capabilities = parseNumber<std::uint64_t>(value, hexadecimalBase).value_or(0);
         }
     }
     return hasUsers && status.state != '\0' ? std::optional{status} : std::nullopt;
