@@ -69,6 +69,31 @@ TEST(OptionRules, SaysHowToWatch) {
     EXPECT_EQ(line({"profiles", "--sort", "version"}).options.sort, "version");
 }
 
+TEST(OptionRules, SaysWhereMetricsAre) {
+    const auto metrics = [](const std::vector<std::string>& arguments) {
+        return std::get<ServeCommand>(line(arguments).command).metrics;
+    };
+    EXPECT_EQ(metrics({"serve"}), std::nullopt);
+    EXPECT_EQ(metrics({"serve", "--metrics"}), "");
+    EXPECT_EQ(metrics({"serve", "--metrics", "--read-only"}), "");
+    EXPECT_EQ(metrics({"serve", "--metrics", "[::1]:9", "--read-only"}), "[::1]:9");
+    EXPECT_EQ(metrics({"serve", "--metrics=[::1]"}), "[::1]");
+    EXPECT_EQ(line({"metrics"}).command, Command(MetricsCommand{}));
+    EXPECT_EQ(line({"--connect", "h", "metrics", "--output", "f"}).command,
+              Command(MetricsCommand{"f"}));
+    for (const char* option : {"--count", "--sort=STATE", "--format=json", "--format=mof"}) {
+        EXPECT_NE(lineRefusal({"metrics", option}), "accepted") << option;
+    }
+    ExporterCommand exporter;
+    exporter.config = "c";
+    exporter.server.listen = "[::1]:9";
+    exporter.check = true;
+    EXPECT_EQ(line({"exporter", "--check", "--config", "c", "--listen", "[::1]:9"}).command,
+              Command(exporter));
+    EXPECT_NE(lineRefusal({"exporter"}), "accepted");
+    EXPECT_NE(lineRefusal({"exporter", "--config", "c", "--connect", "h"}), "accepted");
+}
+
 TEST(OptionRules, AnAddressInBracketsKeepsThem) {
     const std::vector<std::string> servers{"[::1]", "[::1]:5988", "[a,b]"};
     EXPECT_EQ(line({"--connect", "[::1]", "--connect=[::1]:5988", "--connect=[a,b]", "show"})

@@ -2,6 +2,8 @@
 
 #include <optional>
 #include <string>
+#include <utility>
+#include <vector>
 
 #include "http/Authenticator.h"
 #include "http/Exchange.h"
@@ -26,6 +28,9 @@ class Dispatcher {
     void dispatch(const SharedExchange& exchange);
     /// Responds, after a while, that credentials are needed, and logs who had none.
     void refuse(const SharedExchange& exchange, const std::string& who);
+
+    /// Has other users from now on. Only with users.
+    void renewUsers(std::vector<User> users) { authenticator_->renew(std::move(users)); }
 
     /// Runs a short task once the delay is over.
     void runAfter(TaskPool::Clock::duration delay, TaskPool::Task task);

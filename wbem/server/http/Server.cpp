@@ -13,7 +13,8 @@
 #include "http/Connections.h"
 #include "http/Dispatcher.h"
 #include "http/Exchange.h"
-#include "http/PageHead.h"
+#include "http/ReceivedHead.h"
+#include "http/TlsMaterial.h"
 #include "transport/ListeningSocket.h"
 
 namespace cimom::wbem {
@@ -26,42 +27,19 @@ constexpr std::chrono::milliseconds watchInterval{100};
 /// How long clients have to take their last responses when the server ends.
 constexpr std::chrono::seconds farewell{2};
 
-MHD_Result addHeader(void* headers, MHD_ValueKind /*kind*/, const char* name, const char* value) {
-    static_cast<HttpHead*>(headers)->headers.emplace_back(name == nullptr ? "" : name,
-                                                          value == nullptr ? "" : value);
-    return MHD_YES;
-}
-
-HttpHead headOf(MHD_Connection* connection, const char* target, const char* method,
-                const char* version) {
-    HttpHead head{method, target, version, {}};
-    MHD_get_connection_values(connection, MHD_HEADER_KIND, addHeader, &head);
-    // A query would have been taken off the target.
-    if (MHD_get_connection_values(connection, MHD_GET_ARGUMENT_KIND, nullptr, nullptr) > 0) {
-        head.target += '?';
-    }
-    return head;
-}
-
 /// Texts of the library with their lengths: a null byte may be decoded within one.
-MHD_Result addPair(void* pairs, MHD_ValueKind /*kind*/, const char* name, std::size_t nameSize,
-                   const char* value, std::size_t valueSize) {
-    static_cast<std::vector<std::pair<std::string, std::string>>*>(pairs)->emplace_back(
+MHD_Result addArgument(void* arguments, MHD_ValueKind /*kind*/, const char* name,
+                       std::size_t nameSize, const char* value, std::size_t valueSize) {
+    static_cast<PageArguments*>(arguments)->emplace_back(
         name == nullptr ? "" : std::string(name, nameSize),
         value == nullptr ? "" : std::string(value, valueSize));
     return MHD_YES;
 }
 
-PageRequest pageRequestOf(MHD_Connection* connection, const HttpHead& head) {
-    PageRequest request;
-    request.path = head.target;
-    MHD_get_connection_values_n(connection, MHD_GET_ARGUMENT_KIND, addPair, &request.arguments);
-    MHD_get_connection_values_n(connection, MHD_HEADER_KIND, addPair, &request.headers);
-    if (!request.arguments.empty()) {
-        request.path.pop_back();  // the sign in front of the query
-    }
-    request.arrived = Exchange::Clock::now();
-    return request;
+PageArguments argumentsOf(MHD_Connection* connection) {
+    PageArguments arguments;
+    MHD_get_connection_values_n(connection, MHD_GET_ARGUMENT_KIND, addArgument, &arguments);
+    return arguments;
 }
 
 }  // namespace
@@ -75,6 +53,10 @@ class Server::Implementation {
           log_(std::move(log)),
           connections_(settings_.limits.request, settings_.limits.response),
           dispatcher_(manager, pages_, settings_, log_, counts_) {
+        if (settings_.tls) {
+            tls_.emplace(*settings_.tls,
+                         [this](const std::string& line) { log_(LogKind::failure, line); });
+        }
         try {
             start();
         } catch (const SocketError& error) {
@@ -110,6 +92,20 @@ class Server::Implementation {
                std::to_string(port_) + (pages_ ? "/" : "/cimom");
     }
 
+    void renewTls(const ServerSettings::Tls& tls) {
+        if (!tls_) {
+            throw ServerError("a server without TLS gets it by a restart only");
+        }
+        tls_->renew(tls);
+    }
+
+    void renewUsers(std::vector<User> users) {
+        if (!settings_.users) {
+            throw ServerError("a server without users gets them by a restart only");
+        }
+        dispatcher_.renewUsers(std::move(users));
+    }
+
   private:
     static ServerSettings checked(ServerSettings settings) {
         checkSettings(settings);
@@ -135,7 +131,7 @@ class Server::Implementation {
             {MHD_OPTION_CONNECTION_MEMORY_LIMIT, static_cast<std::intptr_t>(memory), nullptr},
             {MHD_OPTION_CONNECTION_TIMEOUT, static_cast<std::intptr_t>(limits.request.count()),
              nullptr},
-            {MHD_OPTION_STRICT_FOR_CLIENT, 1, nullptr},
+            {MHD_OPTION_STRICT_FOR_CLIENT, libraryStrictness(), nullptr},
             {MHD_OPTION_NOTIFY_COMPLETED, reinterpret_cast<std::intptr_t>(&requestEnded), this},
             {MHD_OPTION_NOTIFY_CONNECTION, reinterpret_cast<std::intptr_t>(&connectionChanged),
              this},
@@ -148,22 +144,14 @@ class Server::Implementation {
             MHD_USE_EPOLL_INTERNAL_THREAD | MHD_ALLOW_SUSPEND_RESUME | MHD_USE_ERROR_LOG;
         if (settings_.tls) {
             flags |= MHD_USE_TLS;
-            const auto text = [&options](MHD_OPTION option, std::string& value) {
-                options.push_back({option, 0, value.data()});
-            };
-            text(MHD_OPTION_HTTPS_MEM_CERT, settings_.tls->certificate);
-            text(MHD_OPTION_HTTPS_MEM_KEY, settings_.tls->key);
-            text(MHD_OPTION_HTTPS_PRIORITIES, tlsPriorities_);
+            TlsSessions::addOptions(options);
         }
         options.push_back({MHD_OPTION_END, 0, nullptr});
         daemon_.reset(MHD_start_daemon(flags, 0, nullptr, nullptr, &handleRequest, this,
                                        MHD_OPTION_EXTERNAL_LOGGER, &libraryMessage, this,
                                        MHD_OPTION_ARRAY, options.data(), MHD_OPTION_END));
         if (!daemon_) {
-            throw ServerError(settings_.tls
-                                  ? "the server cannot start; are certificate and key a pair? " +
-                                        libraryDiagnostic_
-                                  : "the server cannot start: " + libraryDiagnostic_);
+            throw ServerError("the server cannot start: " + libraryDiagnostic_);
         }
         socket_ = socket.release();
         starting_ = false;
@@ -201,6 +189,9 @@ class Server::Implementation {
                                   MHD_ConnectionNotificationCode code) {
         auto& server = *static_cast<Implementation*>(self);
         if (code == MHD_CONNECTION_NOTIFY_STARTED) {
+            if (server.tls_) {
+                server.tls_->opened(connection);
+            }
             const auto* const socket =
                 MHD_get_connection_info(connection, MHD_CONNECTION_INFO_CONNECTION_FD);
             const auto* const client =
@@ -212,6 +203,9 @@ class Server::Implementation {
             server.counts_.connectionClosed();
             server.connections_.closed(static_cast<Connections::Connection*>(*context));
             *context = nullptr;
+            if (server.tls_) {
+                server.tls_->closed(connection);
+            }
         }
     }
 
@@ -236,8 +230,8 @@ class Server::Implementation {
             if (*context == nullptr) {
                 auto exchange = std::make_unique<SharedExchange>(
                     std::make_shared<Exchange>(connection, connectionOf(connection).address));
-                const MHD_Result result = server.begin(connection, **exchange,
-                                                       headOf(connection, target, method, version));
+                const MHD_Result result = server.begin(
+                    connection, **exchange, receivedHead(connection, target, method, version));
                 *context = exchange.release();
                 return result;
             }
@@ -259,9 +253,12 @@ class Server::Implementation {
     MHD_Result begin(MHD_Connection* connection, Exchange& exchange, const HttpHead& head) {
         try {
             if (pages_) {
-                exchange.page = pageRequestOf(connection, head);
-                exchange.headers.emplace().authorization =
-                    checkPageRequest(head.method, head.version, *exchange.page, settings_.limits);
+                exchange.page = readPageHead(head, argumentsOf(connection), settings_.limits);
+                exchange.headers.emplace().authorization = exchange.page->authorization;
+            } else if (asksForCapabilities(head, settings_.limits)) {
+                // Sent once the request is over: at once would end the connection.
+                exchange.early = HttpResponse::capabilities(settings_.readOnly);
+                return MHD_YES;
             } else {
                 exchange.headers = readHead(head, settings_.limits);
             }
@@ -274,11 +271,13 @@ class Server::Implementation {
             return MHD_YES;
         } catch (const HttpFailure& failure) {
             log_(LogKind::request, exchange.address() + ": " + failure.what());
-            HttpResponse refused = HttpResponse::failure(failure);
+            HttpResponse response = HttpResponse::failure(failure);
             if (pages_) {
-                refused.allowed = "GET, HEAD";
+                response.allowed = "GET, HEAD";
             }
-            return send(connection, exchange, std::move(refused));
+            // Where the next request begins is not certain.
+            response.close = true;
+            return send(connection, exchange, std::move(response));
         }
     }
 
@@ -337,10 +336,9 @@ class Server::Implementation {
 
     const PageHandler pages_;  ///< empty: CIM-XML is served
     ServerCounts counts_;
-    // Not constant, as the library takes its texts by pointers to plain char.
-    ServerSettings settings_;
-    std::string tlsPriorities_ = "NORMAL:-VERS-ALL:+VERS-TLS1.3:+VERS-TLS1.2";
+    const ServerSettings settings_;
     const ServerLog log_;
+    std::optional<TlsSessions> tls_;
     Connections connections_;
     std::atomic<bool> starting_{true};
     std::atomic<bool> stopping_{false};
@@ -368,6 +366,14 @@ std::uint16_t Server::port() const noexcept {
 
 const ServerCounts& Server::counts() const noexcept {
     return implementation_->counts();
+}
+
+void Server::renewTls(const ServerSettings::Tls& tls) {
+    implementation_->renewTls(tls);
+}
+
+void Server::renewUsers(std::vector<User> users) {
+    implementation_->renewUsers(std::move(users));
 }
 
 std::string Server::url() const {
