@@ -1,10 +1,13 @@
 #pragma once
 
+#include <memory>
 #include <optional>
 #include <string>
 
+#include "http/AddressShares.h"
 #include "http/Authenticator.h"
 #include "http/Exchange.h"
+#include "http/FairQueue.h"
 #include "http/TaskPool.h"
 #include "operations/Operations.h"
 #include "wbem/ServerSettings.h"
@@ -16,13 +19,18 @@ namespace cimom::wbem {
 /// use.
 class Dispatcher {
   public:
-    /// Borrows all three.
-    Dispatcher(ObjectManager& manager, const ServerSettings& settings, const ServerLog& log);
+    /// Borrows all four.
+    Dispatcher(ObjectManager& manager, const ServerSettings& settings, const ServerLog& log,
+               AddressShares& shares);
 
-    /// Sees to the response to a request that is complete and handed over.
+    /// Whether the head of a request, with users, proves without a long check who sent it.
+    [[nodiscard]] bool isRemembered(Exchange& exchange);
+    /// Finds out who sent a request that is handed over behind its head, which may take long:
+    /// gives it back, or finishes it.
+    void authenticate(const SharedExchange& exchange);
+    /// Sees to the response to a request that is complete and handed over. With users, its user
+    /// is known.
     void dispatch(const SharedExchange& exchange);
-    /// Responds, after a while, that credentials are needed, and logs who had none.
-    void refuse(const SharedExchange& exchange, const std::string& who);
 
     /// Runs a short task once the delay is over.
     void runAfter(TaskPool::Clock::duration delay, TaskPool::Task task);
@@ -33,16 +41,22 @@ class Dispatcher {
     void stop();
 
   private:
-    void admit(const SharedExchange& exchange, const Identity& identity);
-    void checkPassword(const SharedExchange& exchange);
+    /// What one check has of its address, until the client has its response.
+    class Turn;
+    void checkPassword(const SharedExchange& exchange, const std::shared_ptr<Turn>& turn);
+    /// Responds, after a while, that the credentials are wrong, and logs whose.
+    void refuse(const SharedExchange& exchange, const std::shared_ptr<Turn>& turn);
     void runOrRefuse(TaskPool& pool, const SharedExchange& exchange, TaskPool::Task task);
+    [[nodiscard]] HttpResponse carryOut(Exchange& exchange, Caller caller);
     /// Carries a request out, in a worker.
     void work(const SharedExchange& exchange, const Caller& caller);
 
     const ServerSettings& settings_;
     const ServerLog& log_;
+    AddressShares& shares_;
     Operations operations_;
     std::optional<Authenticator> authenticator_;
+    FairQueue checks_;
     // End first, in this order reversed: their tasks use all of the above.
     TaskPool workers_;
     TaskPool gate_;
