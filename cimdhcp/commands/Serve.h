@@ -21,9 +21,10 @@ struct Listening {
 /// Throws Failure with ExitStatus::usage.
 [[nodiscard]] Listening readListening(const std::string& text);
 
-/// Runs the WBEM server until the process gets SIGTERM or SIGINT, which it blocks
-/// in this thread. Prints one line when the server accepts connections, and logs the rest.
-/// Throws Failure when the server cannot start.
+/// Runs the WBEM server until the process gets SIGTERM or SIGINT; at SIGHUP it reads
+/// certificate, key, users and the settings of logging anew. Blocks the three in this thread.
+/// Prints one line when the server accepts connections, and logs the rest. Throws Failure when the
+/// server cannot start.
 void serve(const ServeCommand& command, cimom::ObjectManager& manager, std::ostream& out);
 
 }  // namespace cimdhcp

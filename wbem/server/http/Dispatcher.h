@@ -3,6 +3,8 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <utility>
+#include <vector>
 
 #include "http/AddressShares.h"
 #include "http/Authenticator.h"
@@ -31,6 +33,9 @@ class Dispatcher {
     /// Sees to the response to a request that is complete and handed over. With users, its user
     /// is known.
     void dispatch(const SharedExchange& exchange);
+
+    /// Has other users from now on. Only with users.
+    void renewUsers(std::vector<User> users) { authenticator_->renew(std::move(users)); }
 
     /// Runs a short task once the delay is over.
     void runAfter(TaskPool::Clock::duration delay, TaskPool::Task task);

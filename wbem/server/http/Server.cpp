@@ -21,6 +21,8 @@
 #include "http/Connections.h"
 #include "http/Dispatcher.h"
 #include "http/Exchange.h"
+#include "http/ReceivedHead.h"
+#include "http/TlsMaterial.h"
 #include "transport/ListeningSocket.h"
 
 namespace cimom::wbem {
@@ -37,23 +39,6 @@ constexpr std::chrono::seconds logInterval{10};
 constexpr std::size_t shortBody = 65536;
 /// How long clients have to take their last responses when the server ends.
 constexpr std::chrono::seconds farewell{2};
-
-MHD_Result addHeader(void* headers, MHD_ValueKind /*kind*/, const char* name, const char* value) {
-    static_cast<HttpHead*>(headers)->headers.emplace_back(name == nullptr ? "" : name,
-                                                          value == nullptr ? "" : value);
-    return MHD_YES;
-}
-
-HttpHead headOf(MHD_Connection* connection, const char* target, const char* method,
-                const char* version) {
-    HttpHead head{method, target, version, {}};
-    MHD_get_connection_values(connection, MHD_HEADER_KIND, addHeader, &head);
-    // A query would have been taken off the target.
-    if (MHD_get_connection_values(connection, MHD_GET_ARGUMENT_KIND, nullptr, nullptr) > 0) {
-        head.target += '?';
-    }
-    return head;
-}
 
 /// Sees to it that the process may have a descriptor for each connection and its response.
 /// Throws ServerError.
@@ -89,6 +74,10 @@ class Server::Implementation {
           connections_(settings_.limits, shares_),
           dispatcher_(manager, settings_, log_, shares_) {
         provideDescriptors(settings_.limits);
+        if (settings_.tls) {
+            tls_.emplace(*settings_.tls,
+                         [this](const std::string& line) { log_(LogKind::failure, line); });
+        }
         try {
             start();
         } catch (const SocketError& error) {
@@ -124,6 +113,20 @@ class Server::Implementation {
                std::to_string(port_) + "/cimom";
     }
 
+    void renewTls(const ServerSettings::Tls& tls) {
+        if (!tls_) {
+            throw ServerError("a server without TLS gets it by a restart only");
+        }
+        tls_->renew(tls);
+    }
+
+    void renewUsers(std::vector<User> users) {
+        if (!settings_.users) {
+            throw ServerError("a server without users gets them by a restart only");
+        }
+        dispatcher_.renewUsers(std::move(users));
+    }
+
   private:
     static ServerSettings checked(ServerSettings settings) {
         checkSettings(settings);
@@ -153,7 +156,7 @@ class Server::Implementation {
             {MHD_OPTION_CONNECTION_MEMORY_LIMIT, static_cast<std::intptr_t>(memory), nullptr},
             {MHD_OPTION_CONNECTION_TIMEOUT, static_cast<std::intptr_t>(limits.request.count()),
              nullptr},
-            {MHD_OPTION_STRICT_FOR_CLIENT, 1, nullptr},
+            {MHD_OPTION_STRICT_FOR_CLIENT, libraryStrictness(), nullptr},
             {MHD_OPTION_NOTIFY_COMPLETED, reinterpret_cast<std::intptr_t>(&requestEnded), this},
             {MHD_OPTION_NOTIFY_CONNECTION, reinterpret_cast<std::intptr_t>(&connectionChanged),
              this},
@@ -166,22 +169,14 @@ class Server::Implementation {
                          MHD_USE_NO_LISTEN_SOCKET | MHD_USE_ERROR_LOG;
         if (settings_.tls) {
             flags |= MHD_USE_TLS;
-            const auto text = [&options](MHD_OPTION option, std::string& value) {
-                options.push_back({option, 0, value.data()});
-            };
-            text(MHD_OPTION_HTTPS_MEM_CERT, settings_.tls->certificate);
-            text(MHD_OPTION_HTTPS_MEM_KEY, settings_.tls->key);
-            text(MHD_OPTION_HTTPS_PRIORITIES, tlsPriorities_);
+            TlsSessions::addOptions(options);
         }
         options.push_back({MHD_OPTION_END, 0, nullptr});
         daemon_.reset(MHD_start_daemon(flags, 0, nullptr, nullptr, &handleRequest, this,
                                        MHD_OPTION_EXTERNAL_LOGGER, &libraryMessage, this,
                                        MHD_OPTION_ARRAY, options.data(), MHD_OPTION_END));
         if (!daemon_) {
-            throw ServerError(settings_.tls
-                                  ? "the server cannot start; are certificate and key a pair? " +
-                                        libraryDiagnostic_
-                                  : "the server cannot start: " + libraryDiagnostic_);
+            throw ServerError("the server cannot start: " + libraryDiagnostic_);
         }
         starting_ = false;
         acceptor_.emplace(std::move(socket),
@@ -260,11 +255,17 @@ class Server::Implementation {
                                   MHD_ConnectionNotificationCode code) {
         auto& server = *static_cast<Implementation*>(self);
         if (code == MHD_CONNECTION_NOTIFY_STARTED) {
+            if (server.tls_) {
+                server.tls_->opened(connection);
+            }
             *context = server.connections_.find(
                 MHD_get_connection_info(connection, MHD_CONNECTION_INFO_CONNECTION_FD)->connect_fd);
         } else {
             server.connections_.closed(static_cast<Connections::Connection*>(*context)->socket);
             *context = nullptr;
+            if (server.tls_) {
+                server.tls_->closed(connection);
+            }
         }
     }
 
@@ -290,8 +291,8 @@ class Server::Implementation {
                 const Connections::Connection& of = connectionOf(connection);
                 auto exchange = std::make_unique<SharedExchange>(
                     std::make_shared<Exchange>(connection, of.address, of.key, server.shares_));
-                const MHD_Result result = server.begin(connection, *exchange,
-                                                       headOf(connection, target, method, version));
+                const MHD_Result result = server.begin(
+                    connection, *exchange, receivedHead(connection, target, method, version));
                 *context = exchange.release();
                 return result;
             }
@@ -313,10 +314,18 @@ class Server::Implementation {
     MHD_Result begin(MHD_Connection* connection, const SharedExchange& exchange,
                      const HttpHead& head) {
         try {
+            if (asksForCapabilities(head, settings_.limits)) {
+                // Sent once the request is over: at once would end the connection.
+                exchange->early = HttpResponse::capabilities(settings_.readOnly);
+                return MHD_YES;
+            }
             exchange->headers = readHead(head, settings_.limits);
         } catch (const HttpFailure& failure) {
             log_(LogKind::request, exchange->address() + ": " + failure.what());
-            return send(connection, *exchange, HttpResponse::failure(failure));
+            HttpResponse response = HttpResponse::failure(failure);
+            // Where the next request begins is not certain.
+            response.close = true;
+            return send(connection, *exchange, std::move(response));
         }
         exchange->wantsContinue = !head.values("Expect").empty();
         if (!settings_.users) {
@@ -351,6 +360,7 @@ class Server::Implementation {
     MHD_Result refuseBody(MHD_Connection* connection, Exchange& exchange, HttpResponse response) {
         if (exchange.wantsContinue ||
             exchange.headers->contentLength.value_or(shortBody + 1) > shortBody) {
+            response.close = true;
             return send(connection, exchange, std::move(response));
         }
         connections_.expectRequest(connectionOf(connection));
@@ -437,10 +447,9 @@ class Server::Implementation {
                             std::chrono::duration_cast<std::chrono::microseconds>(time));
     }
 
-    // Not constant, as the library takes its texts by pointers to plain char.
-    ServerSettings settings_;
-    std::string tlsPriorities_ = "NORMAL:-VERS-ALL:+VERS-TLS1.3:+VERS-TLS1.2";
+    const ServerSettings settings_;
     const ServerLog log_;
+    std::optional<TlsSessions> tls_;
     AddressShares shares_;
     Connections connections_;
     Connections::Clock::time_point nextTold_{};  ///< of the watch alone
@@ -462,6 +471,14 @@ Server::~Server() = default;
 
 std::uint16_t Server::port() const noexcept {
     return implementation_->port();
+}
+
+void Server::renewTls(const ServerSettings::Tls& tls) {
+    implementation_->renewTls(tls);
+}
+
+void Server::renewUsers(std::vector<User> users) {
+    implementation_->renewUsers(std::move(users));
 }
 
 std::string Server::url() const {

@@ -96,6 +96,64 @@ TEST(HttpHead, ServesNothingElse) {
     }
 }
 
+TEST(HttpHead, TakesTheWholeUrlOfWhereItServes) {
+    HttpHead head = good();
+    for (const char* target :
+         {"http://h/cimom", "HTTPS://192.0.2.7:5989/cimom", "http://[2001:db8::1]/cimom"}) {
+        head.target = target;
+        EXPECT_EQ(failureOf(head), "none") << target;
+    }
+    for (const char* target : {"http:///cimom", "http://h", "http://h/", "http://h/cimom/",
+                               "ftp://h/cimom", "//h/cimom", "http:/cimom", "cimom"}) {
+        head.target = target;
+        EXPECT_EQ(failureOf(head), "404") << target;
+    }
+}
+
+TEST(HttpHead, IsRefusedIfOthersCouldReadAnotherRequest) {
+    HttpHead head = good();
+    head.ambiguous = true;
+    EXPECT_EQ(failureOf(head), "400");
+    for (const char* name :
+         {"", "Content-Length ", " X", "X\tY", "X:", "X\x7F", "X(", "\xC3\xA9"}) {
+        EXPECT_EQ(failureWith(name, "10"), "400") << name;
+    }
+    for (const char* value : {"a\rb", "a\x01", "\x7F", "a\nb"}) {
+        EXPECT_EQ(failureWith("X", value), "400") << value;
+    }
+    for (const char* value : {"", "a\tb", "caf\xC3\xA9"}) {
+        EXPECT_EQ(failureWith("X!#$%&'*+-.^_`|~9", value), "none") << value;
+    }
+}
+
+TEST(HttpHead, ListsSayWhatAClientTakes) {
+    EXPECT_TRUE(accepts({"gzip"}, "gzip"));
+    EXPECT_TRUE(accepts({"deflate, GZip;q=0.5"}, "gzip"));
+    EXPECT_TRUE(accepts({"deflate", "br , gzip ; Q=1"}, "gzip"));
+    EXPECT_TRUE(accepts({"*"}, "gzip"));
+    EXPECT_TRUE(accepts({"gzip, *;q=0"}, "gzip"));
+    for (const char* list : {"", "deflate", "gzip;q=0", "gzip; q=0.000", "*, gzip;q=0", "*;q=0",
+                             "xgzip", "gzip2", ",,;"}) {
+        EXPECT_FALSE(accepts({list}, "gzip")) << list;
+    }
+    EXPECT_FALSE(accepts({}, "gzip"));
+}
+
+TEST(HttpHead, OptionsAskWhatIsOffered) {
+    HttpHead head{"OPTIONS", "*", "HTTP/1.1", {{"Host", "h"}}};
+    EXPECT_TRUE(asksForCapabilities(head, {}));
+    head.target = "/cimom";
+    EXPECT_TRUE(asksForCapabilities(head, {}));
+    head.target = "http://h/cimom";
+    EXPECT_TRUE(asksForCapabilities(head, {}));
+    head.target = "/other";
+    EXPECT_FALSE(asksForCapabilities(head, {}));
+    head = {"GET", "*", "HTTP/1.1", {}};
+    EXPECT_FALSE(asksForCapabilities(head, {}));
+    head = {"OPTIONS", "*", "HTTP/1.1", {{"A ", "b"}}};
+    EXPECT_THROW(static_cast<void>(asksForCapabilities(head, {})), HttpFailure);
+}
+
 TEST(HttpHead, WantsTheHeadersOfAnOperation) {
     EXPECT_EQ(failureWithout("Host"), "400");
     EXPECT_EQ(failureWithout("content-type"), "400");

@@ -182,6 +182,17 @@ TEST_F(WbemUsers, OnlyTheRoleModifyModifies) {
     EXPECT_THAT(log[1], HasSubstr("-> \"by users\" status=OK"));
 }
 
+TEST_F(WbemUsers, AreTakenAnewWhileTheServerRuns) {
+    EXPECT_EQ(statusOf(ada), 200U);
+    server.running().renewUsers({{"ada", wbem::Role::modify, wbem::hashPassword("other")}});
+    EXPECT_EQ(statusOf(ada), 401U);
+    EXPECT_EQ(statusOf(bob), 401U);
+    server.running().renewUsers({{"ada", wbem::Role::modify, wbem::hashPassword("secret")}});
+    EXPECT_EQ(statusOf(ada), 200U);
+    TestServer open;
+    EXPECT_THROW(open.running().renewUsers({}), wbem::ServerError);
+}
+
 TEST_F(WbemUsers, AnEnumerationBelongsToItsUser) {
     const std::string context =
         output(responseOf(ask(ada, "OpenEnumerateInstances", classParameter("Test_Left")).body),

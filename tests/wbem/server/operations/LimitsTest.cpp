@@ -152,6 +152,13 @@ TEST(Modification, TellsWhyItWasNotDone) {
               "status=CIM_ERR_ACCESS_DENIED (this needs the right to modify)");
 }
 
+TEST(Modification, TellsThatItIsNotCertain) {
+    Modification made = modification();
+    made.doubt = "Name is null";
+    EXPECT_EQ(modificationText(made), R"(modify user=none address=192.0.2.7 object=root/x:A.k="v" )"
+                                      "status=ACCEPTED (Name is null)");
+}
+
 TEST(Modification, ShortensLongValues) {
     Modification made = modification();
     made.changes = {
