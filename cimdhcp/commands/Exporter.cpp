@@ -432,6 +432,10 @@ void serveExporter(const ExporterCommand& command, const Options& options, std::
         ServeCommand where = command.server;
         where.limits.workers = options.parallel;
         where.limits.stuck = 1;
+        // One Prometheus, with a connection for each target, is all its clients.
+        where.limits.connectionsEach = where.limits.connections;
+        where.limits.checksEach = where.limits.connections;
+        where.limits.connectionRate = 10 * where.limits.connections;
         // Longer than any probe takes, and than Prometheus mostly lets a connection rest.
         where.limits.request = std::chrono::seconds(120);
         constexpr std::uint16_t port = 9989;

@@ -53,7 +53,8 @@ struct HttpResponse {
 /// A client that sends whatever a test wants to.
 class RawClient {
   public:
-    explicit RawClient(std::uint16_t port);
+    /// `from`: the loopback address that it has.
+    explicit RawClient(std::uint16_t port, const char* from = "127.0.0.1");
     ~RawClient();
     RawClient(RawClient&& other) noexcept : fd_(std::exchange(other.fd_, -1)) {}
     RawClient(const RawClient&) = delete;

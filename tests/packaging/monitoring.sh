@@ -69,7 +69,9 @@ started() { # started NAME COMMAND...: prints where it listens
         sleep 0.05
     done
 }
-tls=(--tls-cert ca.pem --tls-key key.pem --users users)
+# All machines are one server, and all their clients are one.
+tls=(--tls-cert ca.pem --tls-key key.pem --users users --max-connections-each 512
+    --max-checks-each 512 --max-connection-rate 1000)
 declare -A ports
 for kind in good asking ended rogue; do
     started $kind-metrics "$program" --tree $kind.json serve --listen 0.0.0.0:0 \

@@ -191,12 +191,36 @@ TEST(ServeOptions, EachLimitIsItsOwn) {
     serve.limits.response = std::chrono::seconds(13);
     serve.limits.sessions.defaultTimeout = std::chrono::seconds(14);
     serve.limits.sessions.longestTimeout = std::chrono::seconds(15);
+    serve.limits.connectionsEach = 16;
+    serve.limits.connectionRate = 17;
+    serve.limits.checksEach = 18;
+    serve.limits.refusalsEach = 19;
+    serve.limits.memory = 20;
+    serve.limits.sessions.each = 21;
+    serve.limits.head = std::chrono::seconds(22);
     std::vector<std::string> arguments;
-    for (const char* option :
-         {"--max-header-line", "--max-headers", "--max-body", "--max-depth", "--max-connections",
-          "--max-waiting", "--max-enumerations", "--max-result", "--workers", "--max-stuck",
-          "--io-threads", "--request-timeout", "--answer-timeout", "--enumeration-timeout",
-          "--max-enumeration-timeout"}) {
+    for (const char* option : {"--max-header-line",
+                               "--max-headers",
+                               "--max-body",
+                               "--max-depth",
+                               "--max-connections",
+                               "--max-waiting",
+                               "--max-enumerations",
+                               "--max-result",
+                               "--workers",
+                               "--max-stuck",
+                               "--io-threads",
+                               "--request-timeout",
+                               "--answer-timeout",
+                               "--enumeration-timeout",
+                               "--max-enumeration-timeout",
+                               "--max-connections-each",
+                               "--max-connection-rate",
+                               "--max-checks-each",
+                               "--max-refusals-each",
+                               "--max-memory",
+                               "--max-enumerations-each",
+                               "--head-timeout"}) {
         arguments.emplace_back(option);
         arguments.push_back(std::to_string(arguments.size() / 2 + 1));
     }

@@ -1,15 +1,23 @@
 #include "wbem/Server.h"
 
+#include <malloc.h>
 #include <microhttpd.h>
+#include <sys/resource.h>
+#include <sys/socket.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <array>
 #include <cstdarg>
 #include <cstdio>
 #include <cstring>
+#include <optional>
+#include <system_error>
 #include <thread>
 #include <utility>
 
+#include "http/Acceptor.h"
+#include "http/AddressShares.h"
 #include "http/Connections.h"
 #include "http/Dispatcher.h"
 #include "http/Exchange.h"
@@ -24,6 +32,11 @@ namespace {
 constexpr std::uint16_t httpPort = 5988;
 constexpr std::uint16_t httpsPort = 5989;
 constexpr std::chrono::milliseconds watchInterval{100};
+/// How often what happens again and again is logged.
+constexpr std::chrono::seconds logInterval{10};
+/// A refused body that is not longer is read and forgotten, so that its connection can go on;
+/// else the connection is closed.
+constexpr std::size_t shortBody = 65536;
 /// How long clients have to take their last responses when the server ends.
 constexpr std::chrono::seconds farewell{2};
 
@@ -42,6 +55,29 @@ PageArguments argumentsOf(MHD_Connection* connection) {
     return arguments;
 }
 
+/// Sees to it that the process may have a descriptor for each connection and its response.
+/// Throws ServerError.
+void provideDescriptors(const Limits& limits) {
+    constexpr rlim_t others = 128;
+    const rlim_t connections = limits.connections + Connections::mostEnding;
+    const rlim_t wanted = 2 * connections + limits.sessions.sessions + others;
+    rlimit files{};
+    if (::getrlimit(RLIMIT_NOFILE, &files) != 0 || files.rlim_cur >= wanted) {
+        return;
+    }
+    const rlim_t possible = std::min(wanted, files.rlim_max);
+    rlimit raised = files;
+    raised.rlim_cur = possible;
+    const bool isRaised = possible > files.rlim_cur && ::setrlimit(RLIMIT_NOFILE, &raised) == 0;
+    const rlim_t most = isRaised ? possible : files.rlim_cur;
+    if (most < connections + others) {
+        throw ServerError("the process may have " + std::to_string(most) +
+                          " descriptors (ulimit -n, LimitNOFILE=); " +
+                          std::to_string(limits.connections) + " connections need " +
+                          std::to_string(connections + others));
+    }
+}
+
 }  // namespace
 
 class Server::Implementation {
@@ -51,8 +87,10 @@ class Server::Implementation {
         : pages_(std::move(pages)),
           settings_(checked(std::move(settings))),
           log_(std::move(log)),
-          connections_(settings_.limits.request, settings_.limits.response),
-          dispatcher_(manager, pages_, settings_, log_, counts_) {
+          shares_(settings_.limits),
+          connections_(settings_.limits, shares_),
+          dispatcher_(manager, pages_, settings_, log_, shares_, counts_) {
+        provideDescriptors(settings_.limits);
         if (settings_.tls) {
             tls_.emplace(*settings_.tls,
                          [this](const std::string& line) { log_(LogKind::failure, line); });
@@ -61,13 +99,15 @@ class Server::Implementation {
             start();
         } catch (const SocketError& error) {
             throw ServerError(error.what());
+        } catch (const std::system_error& error) {
+            throw ServerError(error.what());
         }
         watch();
     }
 
     ~Implementation() {
         stopping_ = true;
-        MHD_quiesce_daemon(daemon_.get());
+        acceptor_.reset();
         // From here on only the requests that a worker has are finished.
         dispatcher_.stop();
         connections_.endAll();
@@ -77,7 +117,6 @@ class Server::Implementation {
         }
         // Ends what still comes in on open connections, too: see handle().
         daemon_.reset();
-        ::close(socket_);
     }
     Implementation(const Implementation&) = delete;
     Implementation& operator=(const Implementation&) = delete;
@@ -126,8 +165,12 @@ class Server::Implementation {
         constexpr std::size_t further = 65536;
         const std::size_t memory = 2 * limits.headers + further;
         std::vector<MHD_OptionItem> options{
-            {MHD_OPTION_LISTEN_SOCKET, socket.get(), nullptr},
-            {MHD_OPTION_CONNECTION_LIMIT, static_cast<std::intptr_t>(limits.connections), nullptr},
+            // So that no thread ever meets the limit: Connections counts, and libmicrohttpd
+            // 0.9.75 would not answer any more after it had met its own.
+            {MHD_OPTION_CONNECTION_LIMIT,
+             static_cast<std::intptr_t>(limits.ioThreads * 2 *
+                                        (limits.connections + Connections::mostEnding)),
+             nullptr},
             {MHD_OPTION_CONNECTION_MEMORY_LIMIT, static_cast<std::intptr_t>(memory), nullptr},
             {MHD_OPTION_CONNECTION_TIMEOUT, static_cast<std::intptr_t>(limits.request.count()),
              nullptr},
@@ -140,8 +183,8 @@ class Server::Implementation {
             options.push_back({MHD_OPTION_THREAD_POOL_SIZE,
                                static_cast<std::intptr_t>(limits.ioThreads), nullptr});
         }
-        unsigned flags =
-            MHD_USE_EPOLL_INTERNAL_THREAD | MHD_ALLOW_SUSPEND_RESUME | MHD_USE_ERROR_LOG;
+        unsigned flags = MHD_USE_EPOLL_INTERNAL_THREAD | MHD_ALLOW_SUSPEND_RESUME |
+                         MHD_USE_NO_LISTEN_SOCKET | MHD_USE_ERROR_LOG;
         if (settings_.tls) {
             flags |= MHD_USE_TLS;
             TlsSessions::addOptions(options);
@@ -153,8 +196,31 @@ class Server::Implementation {
         if (!daemon_) {
             throw ServerError("the server cannot start: " + libraryDiagnostic_);
         }
-        socket_ = socket.release();
         starting_ = false;
+        acceptor_.emplace(std::move(socket),
+                          [this](int client, const sockaddr* address, socklen_t length) {
+                              accept(client, address, length);
+                          });
+    }
+
+    /// Takes a new connection, or closes it.
+    void accept(int client, const sockaddr* address, socklen_t length) {
+        bool isAdmitted = false;
+        try {
+            isAdmitted = connections_.admit(client, addressKey(address), addressText(address));
+        } catch (const std::exception& error) {
+            // Out of memory.
+            log_(LogKind::failure, error.what());
+        }
+        if (!isAdmitted) {
+            // The client is told at once, and nothing of the connection is kept.
+            const linger none{1, 0};
+            static_cast<void>(::setsockopt(client, SOL_SOCKET, SO_LINGER, &none, sizeof none));
+            ::close(client);
+        } else if (MHD_add_connection(daemon_.get(), client, address, length) != MHD_YES) {
+            // It has closed the socket.
+            connections_.closed(client);
+        }
     }
 
     /// Looks for what is overdue, again and again.
@@ -162,8 +228,26 @@ class Server::Implementation {
         dispatcher_.runAfter(watchInterval, [this] {
             connections_.endOverdue();
             dispatcher_.endOverdue();
+            shares_.tidy();
+            if (shares_.gaveMuch()) {
+                // What the threads have freed between what they still use goes back, too.
+                ::malloc_trim(0);
+            }
+            tellOfTurnedAway();
             watch();
         });
+    }
+
+    void tellOfTurnedAway() {
+        const auto now = Connections::Clock::now();
+        if (now < nextTold_) {
+            return;
+        }
+        if (const auto count = connections_.takeTurnedAway(); count > 0) {
+            log_(LogKind::refusal, "closed " + std::to_string(count) +
+                                       " connections of addresses that had their share");
+            nextTold_ = now + logInterval;
+        }
     }
 
     // Called by libmicrohttpd, in its threads.
@@ -192,16 +276,12 @@ class Server::Implementation {
             if (server.tls_) {
                 server.tls_->opened(connection);
             }
-            const auto* const socket =
-                MHD_get_connection_info(connection, MHD_CONNECTION_INFO_CONNECTION_FD);
-            const auto* const client =
-                MHD_get_connection_info(connection, MHD_CONNECTION_INFO_CLIENT_ADDRESS);
             server.counts_.connectionOpened();
-            *context = server.connections_.opened(
-                socket->connect_fd, addressText(client == nullptr ? nullptr : client->client_addr));
+            *context = server.connections_.find(
+                MHD_get_connection_info(connection, MHD_CONNECTION_INFO_CONNECTION_FD)->connect_fd);
         } else {
             server.counts_.connectionClosed();
-            server.connections_.closed(static_cast<Connections::Connection*>(*context));
+            server.connections_.closed(static_cast<Connections::Connection*>(*context)->socket);
             *context = nullptr;
             if (server.tls_) {
                 server.tls_->closed(connection);
@@ -228,10 +308,11 @@ class Server::Implementation {
         auto& server = *static_cast<Implementation*>(self);
         try {
             if (*context == nullptr) {
+                const Connections::Connection& of = connectionOf(connection);
                 auto exchange = std::make_unique<SharedExchange>(
-                    std::make_shared<Exchange>(connection, connectionOf(connection).address));
+                    std::make_shared<Exchange>(connection, of.address, of.key, server.shares_));
                 const MHD_Result result = server.begin(
-                    connection, **exchange, receivedHead(connection, target, method, version));
+                    connection, *exchange, receivedHead(connection, target, method, version));
                 *context = exchange.release();
                 return result;
             }
@@ -250,77 +331,139 @@ class Server::Implementation {
 
     // The life of a request.
 
-    MHD_Result begin(MHD_Connection* connection, Exchange& exchange, const HttpHead& head) {
+    MHD_Result begin(MHD_Connection* connection, const SharedExchange& exchange,
+                     const HttpHead& head) {
         try {
             if (pages_) {
-                exchange.page = readPageHead(head, argumentsOf(connection), settings_.limits);
-                exchange.headers.emplace().authorization = exchange.page->authorization;
+                exchange->page = readPageHead(head, argumentsOf(connection), settings_.limits);
+                CimHeaders& headers = exchange->headers.emplace();
+                headers.authorization = exchange->page->authorization;
+                headers.contentLength = 0;
             } else if (asksForCapabilities(head, settings_.limits)) {
                 // Sent once the request is over: at once would end the connection.
-                exchange.early = HttpResponse::capabilities(settings_.readOnly);
+                exchange->early = HttpResponse::capabilities(settings_.readOnly);
                 return MHD_YES;
             } else {
-                exchange.headers = readHead(head, settings_.limits);
+                exchange->headers = readHead(head, settings_.limits);
             }
-            if (settings_.users && !exchange.headers->authorization) {
-                // Nothing of a stranger's body is kept.
-                exchange.early = HttpResponse::refusal();
-            } else {
-                exchange.body.reserve(exchange.headers->contentLength.value_or(0));
-            }
-            return MHD_YES;
         } catch (const HttpFailure& failure) {
-            log_(LogKind::request, exchange.address() + ": " + failure.what());
+            log_(LogKind::request, exchange->address() + ": " + failure.what());
             HttpResponse response = HttpResponse::failure(failure);
             if (pages_) {
                 response.allowed = "GET, HEAD";
             }
             // Where the next request begins is not certain.
             response.close = true;
+            return send(connection, *exchange, std::move(response));
+        }
+        exchange->wantsContinue = !head.values("Expect").empty();
+        if (!settings_.users) {
+            return expectBody(connection, *exchange);
+        }
+        if (!exchange->headers->authorization) {
+            // Many clients ask so first, to learn what they need.
+            return refuseBody(connection, *exchange, HttpResponse::refusal());
+        }
+        if (dispatcher_.isRemembered(*exchange)) {
+            return expectBody(connection, *exchange);
+        }
+        // Nothing of the body is read before it is known whose it is.
+        exchange->isHeadChecked = false;
+        connections_.expectResult(connectionOf(connection), exchange);
+        exchange->suspend();
+        dispatcher_.authenticate(exchange);
+        return MHD_YES;
+    }
+
+    MHD_Result expectBody(MHD_Connection* connection, Exchange& exchange) {
+        connections_.expectRequest(connectionOf(connection));
+        if (!shares_.hasMemory(exchange.key(), exchange.headers->contentLength.value_or(0))) {
+            log_(LogKind::request, exchange.address() + ": no memory for its request");
+            return refuseBody(connection, exchange,
+                              HttpResponse::failure(http::serviceUnavailable));
+        }
+        return MHD_YES;
+    }
+
+    /// Responds to a request without its body.
+    MHD_Result refuseBody(MHD_Connection* connection, Exchange& exchange, HttpResponse response) {
+        if (exchange.wantsContinue ||
+            exchange.headers->contentLength.value_or(shortBody + 1) > shortBody) {
+            response.close = true;
             return send(connection, exchange, std::move(response));
         }
+        connections_.expectRequest(connectionOf(connection));
+        exchange.early = std::move(response);
+        return MHD_YES;
     }
 
     /// False when the connection is to be closed: a client that sends far more than
     /// it may is not listened to until its end.
     bool addBody(Exchange& exchange, std::string_view data) const {
         const std::size_t limit = settings_.limits.body;
-        if (!exchange.early && data.size() > limit - exchange.body.size()) {
-            exchange.early = HttpResponse::failure(http::contentTooLarge);
+        if (!exchange.early) {
+            if (data.size() > limit - exchange.body.size()) {
+                exchange.early = HttpResponse::failure(http::contentTooLarge);
+            } else if (!makeRoom(exchange, exchange.body.size() + data.size())) {
+                exchange.early = HttpResponse::failure(http::serviceUnavailable);
+            } else {
+                exchange.body.append(data);
+                return true;
+            }
             exchange.discarded = exchange.body.size();
             exchange.body = std::string();
-        }
-        if (!exchange.early) {
-            exchange.body.append(data);
-            return true;
+            exchange.memory.shrinkTo(0);
         }
         exchange.discarded += data.size();
         return exchange.discarded / 2 <= limit;
     }
 
-    /// The request is complete, or its response is there.
+    /// Memory is taken for what arrives, not for what is announced. False when there is none.
+    [[nodiscard]] bool makeRoom(Exchange& exchange, std::size_t size) const {
+        const std::size_t most = exchange.headers->contentLength.value_or(settings_.limits.body);
+        if (size > exchange.body.capacity()) {
+            const std::size_t capacity =
+                std::max(size, std::min(2 * exchange.body.capacity(), most));
+            // While it grows, there are two of it.
+            if (!exchange.memory.growTo(capacity + exchange.body.capacity())) {
+                return false;
+            }
+            exchange.body.reserve(capacity);
+            exchange.memory.shrinkTo(capacity);
+        }
+        return true;
+    }
+
+    /// The request is complete, or its response is there, or its user is admitted.
     MHD_Result handle(MHD_Connection* connection, const SharedExchange& exchange) {
+        if (!exchange->isHeadChecked) {
+            exchange->isHeadChecked = true;
+            if (exchange->handedOver()) {
+                return refuseBody(connection, *exchange, responseOf(*exchange));
+            }
+            return expectBody(connection, *exchange);
+        }
+        if (exchange->early) {
+            exchange->complete = Exchange::Clock::now();
+            return send(connection, *exchange, *std::move(exchange->early));
+        }
         if (exchange->handedOver()) {
-            auto response = exchange->take();
-            // Woken without a response: not by this server.
-            return send(connection, *exchange,
-                        response ? *std::move(response) : HttpResponse::failure(http::serverFault));
+            return send(connection, *exchange, responseOf(*exchange));
         }
         exchange->complete = Exchange::Clock::now();
         if (stopping_) {
             return send(connection, *exchange, HttpResponse::failure(http::serviceUnavailable));
         }
-        if (exchange->early && !exchange->early->authenticate) {
-            return send(connection, *exchange, *std::move(exchange->early));
-        }
         connections_.expectResult(connectionOf(connection), exchange);
         exchange->suspend();
-        if (exchange->early) {
-            dispatcher_.refuse(exchange, "a client without credentials");
-        } else {
-            dispatcher_.dispatch(exchange);
-        }
+        dispatcher_.dispatch(exchange);
         return MHD_YES;
+    }
+
+    static HttpResponse responseOf(Exchange& exchange) {
+        auto response = exchange.take();
+        // Woken without a response: not by this server.
+        return response ? *std::move(response) : HttpResponse::failure(http::serverFault);
     }
 
     MHD_Result send(MHD_Connection* connection, Exchange& exchange, HttpResponse response) {
@@ -339,13 +482,15 @@ class Server::Implementation {
     const ServerSettings settings_;
     const ServerLog log_;
     std::optional<TlsSessions> tls_;
+    AddressShares shares_;
     Connections connections_;
+    Connections::Clock::time_point nextTold_{};  ///< of the watch alone
     std::atomic<bool> starting_{true};
     std::atomic<bool> stopping_{false};
     std::string libraryDiagnostic_;
     std::uint16_t port_ = 0;
-    int socket_ = -1;  ///< of the daemon, which leaves the closing to us once quiesced
     std::unique_ptr<MHD_Daemon, Stopped> daemon_;
+    std::optional<Acceptor> acceptor_;
     /// Ends first: its tasks use all of the above.
     Dispatcher dispatcher_;
 };
