@@ -93,9 +93,11 @@ _cimdhcp() {
             graph) options+=' --svg' ;;
             tree) options+=' --explain' ;;
             serve) options+=' --listen --tls-cert --tls-key --users --read-only --metrics --max-header-line
-                --max-headers --max-body --max-depth --max-connections --max-waiting --max-stuck
-                --max-result --max-enumerations --workers --io-threads --request-timeout --answer-timeout
-                --enumeration-timeout --max-enumeration-timeout --subscriptions --listener-cacert
+                --max-headers --max-body --max-depth --max-connections --max-connections-each
+                --max-connection-rate --max-checks-each --max-refusals-each --max-memory --max-waiting
+                --max-stuck --max-result --max-enumerations --max-enumerations-each --workers
+                --io-threads --head-timeout --request-timeout --answer-timeout --enumeration-timeout
+                --max-enumeration-timeout --subscriptions --listener-cacert
                 --max-filters --max-listeners --max-subscriptions --max-queue --delivery-retries
                 --retry-interval --listener-timeout --give-up-after' ;;
             user) options+=' --users --modify' ;;

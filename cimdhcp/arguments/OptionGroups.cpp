@@ -35,13 +35,25 @@ void addLimits(CLI::App& app, cimom::wbem::Limits& limits) {
     number("--max-body", limits.body, "Bytes of a request (1048576)");
     number("--max-depth", limits.depth, "Depth of a request's XML (64)");
     number("--max-connections", limits.connections, "Open connections (512)");
+    number("--max-connections-each", limits.connectionsEach,
+           "Of these, of an address that has not shown a right password (32)");
+    number("--max-connection-rate", limits.connectionRate,
+           "New connections of such an address in a second (100)");
+    number("--max-checks-each", limits.checksEach,
+           "Passwords of an address that are checked at the same time (8)");
+    number("--max-refusals-each", limits.refusalsEach,
+           "Wrong passwords of an address in a minute (60)");
+    number("--max-memory", limits.memory, "Bytes that all requests take (50331648)");
     number("--max-waiting", limits.waiting, "Requests that wait for a worker (256)");
-    number("--max-enumerations", limits.sessions.sessions, "Open enumerations (64)");
+    number("--max-enumerations", limits.sessions.sessions, "Open enumerations (128)");
+    number("--max-enumerations-each", limits.sessions.each,
+           "Of these, of one user or address (32)");
     number("--max-result", limits.result, "Bytes of a result (1073741824)");
     number("--workers", limits.workers, "Operations at the same time (4)");
     number("--max-stuck", limits.stuck,
            "Further workers, for those whose operation does not return (16)");
     number("--io-threads", limits.ioThreads, "Threads that read and send (2)");
+    seconds("--head-timeout", limits.head, "For the head of the first request of a connection (5)");
     seconds("--request-timeout", limits.request,
             "For a request to arrive, and again for its operation (30)");
     seconds("--answer-timeout", limits.response, "For a client to take its response (300)");

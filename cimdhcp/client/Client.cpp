@@ -21,6 +21,11 @@ std::vector<Object> present(std::vector<std::optional<Object>> objects) {
 
 }  // namespace
 
+void leaveOutNulls(cimom::Instance& instance) {
+    std::erase_if(instance.properties,
+                  [](const cimom::NamedValue& each) { return each.value.isNull(); });
+}
+
 cimom::ObjectPath Client::classPath(const std::string& className) const {
     return {"", nameSpace_, className, {}};
 }

@@ -125,10 +125,10 @@ class ExporterFile {
     };
 
     [[nodiscard]] Milliseconds seconds(const Json& value, const std::string& key) const {
-        constexpr double longest = 3600;
+        constexpr double longest = 100;
         const double number = value.get<double>();
         if (!(number > 0 && number <= longest)) {
-            refuse('"' + key + "\" is a number of seconds, above 0 and at most 3600");
+            refuse('"' + key + "\" is a number of seconds, above 0 and at most 100");
         }
         return std::chrono::ceil<Milliseconds>(Seconds(number));
     }
@@ -418,22 +418,30 @@ sigset_t blockExporterSignals() {
 
 void serveExporter(const ExporterCommand& command, const Options& options, std::ostream& out) {
     std::atomic<bool> ending = false;
-    const auto log = serverLog();
-    Exporter exporter(ExporterFile(command.config, options, ending), log);
+    ExporterFile file(command.config, options, ending);
     if (command.check) {
-        out << printable(command.config) << ": good, with " << exporter.targets()
-            << (exporter.targets() == 1 ? " target\n" : " targets\n");
+        const std::size_t count = file.read().targets.size();
+        out << printable(command.config) << ": good, with " << count
+            << (count == 1 ? " target\n" : " targets\n");
         return;
     }
     const sigset_t signals = blockExporterSignals();
+    const auto log = serverLog();
+    Exporter exporter(std::move(file), log);
     try {
         ServeCommand where = command.server;
         where.limits.workers = options.parallel;
         where.limits.stuck = 1;
+        // One Prometheus, with a connection for each target, is all its clients.
+        where.limits.connectionsEach = where.limits.connections;
+        where.limits.checksEach = where.limits.connections;
+        where.limits.connectionRate = 10 * where.limits.connections;
+        // Longer than any probe takes, and than Prometheus mostly lets a connection rest.
+        where.limits.request = std::chrono::seconds(120);
         constexpr std::uint16_t port = 9989;
         cimom::wbem::ServerSettings settings = settingsOf(where);
         settings.port = settings.port.value_or(port);
-        const cimom::wbem::Server server(
+        cimom::wbem::Server server(
             [&exporter](const PageRequest& request) { return exporter.page(request); },
             std::move(settings), log);
         out << "Listening on " << server.url() << std::endl;
@@ -441,6 +449,7 @@ void serveExporter(const ExporterCommand& command, const Options& options, std::
         while (::sigwait(&signals, &signal) != 0 || signal == SIGHUP) {
             if (signal == SIGHUP) {
                 exporter.reload();
+                renewListeners(where, {&server});
             }
             signal = 0;
         }

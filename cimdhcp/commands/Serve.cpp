@@ -1,5 +1,7 @@
 #include "commands/Serve.h"
 
+#include <sys/stat.h>
+
 #include <algorithm>
 #include <array>
 #include <cerrno>
@@ -30,6 +32,7 @@
 #include "wbem/Server.h"
 #include "zrcommon/File.h"
 #include "zrcommon/LogLevel.h"
+#include "zrcommon/PlatformSettings.h"
 
 namespace cimdhcp {
 
@@ -42,6 +45,18 @@ std::string pemText(const std::string& file) {
         throw Failure(ExitStatus::notLoaded, file + ": " + std::strerror(errno));
     }
     return *std::move(content);
+}
+
+cimom::wbem::ServerSettings::Tls tlsOf(const ServeCommand& command) {
+    struct ::stat status {};
+    // Whoever has the key can be the server. A group of those that may read keys is usual.
+    if (::stat(command.tlsKey->c_str(), &status) == 0 &&
+        (status.st_mode & (S_IWGRP | S_IRWXO)) != 0) {
+        throw Failure(ExitStatus::notLoaded,
+                      printable(*command.tlsKey) +
+                          ": may be read or written by others; \"chmod 640\" mends that");
+    }
+    return {pemText(*command.tlsCertificate), pemText(*command.tlsKey)};
 }
 
 /// What the interop namespace tells of the server.
@@ -71,8 +86,28 @@ void log(cimom::wbem::LogKind kind, const std::string& message) {
     TKLog::TKLogger::logLevelMessage(
         "cimdhcp/Serve", "log", __LINE__, category,
         kind == cimom::wbem::LogKind::request ? ZR::LogLevel::flow : ZR::LogLevel::failure, nullptr,
-        0, 0, message);
+        0, 0, printable(message));
 }
+
+/// The users as they are now, for those who ask while the server runs. Safe for concurrent use.
+class CurrentUsers {
+  public:
+    explicit CurrentUsers(std::vector<cimom::wbem::User> users) : users_(std::move(users)) {}
+
+    void renew(std::vector<cimom::wbem::User> users) {
+        const std::lock_guard lock(mutex_);
+        users_.swap(users);
+    }
+    [[nodiscard]] bool has(const std::string& name) const {
+        const std::lock_guard lock(mutex_);
+        return std::any_of(users_.begin(), users_.end(),
+                           [&name](const auto& user) { return user.name == name; });
+    }
+
+  private:
+    mutable std::mutex mutex_;
+    std::vector<cimom::wbem::User> users_;
+};
 
 /// Where subscriptions are kept when the command line does not say it.
 std::filesystem::path standardDirectory() {
@@ -86,7 +121,7 @@ std::filesystem::path standardDirectory() {
 /// The subscriptions of clients. Without a directory that was asked for and can be used, they
 /// last as long as the server.
 std::unique_ptr<cimom::wbem::Subscriptions> subscriptionsOf(
-    const ServeCommand& command, const std::optional<std::vector<cimom::wbem::User>>& users,
+    const ServeCommand& command, const std::shared_ptr<const CurrentUsers>& users,
     cimom::ObjectManager& manager) {
     cimom::wbem::SubscriptionSettings settings;
     settings.directory =
@@ -97,10 +132,7 @@ std::unique_ptr<cimom::wbem::Subscriptions> subscriptionsOf(
         static_cast<void>(pemText(*command.delivery.caCertificates));
     }
     if (users) {
-        settings.isUser = [users](const std::string& name) {
-            return std::any_of(users->begin(), users->end(),
-                               [&name](const auto& user) { return user.name == name; });
-        };
+        settings.isUser = [users](const std::string& name) { return users->has(name); };
     }
     const auto tell = [](const std::string& line) { log(cimom::wbem::LogKind::failure, line); };
     try {
@@ -117,13 +149,25 @@ std::unique_ptr<cimom::wbem::Subscriptions> subscriptionsOf(
                                                         tell);
 }
 
-/// The signals that end the server, as sigwait wants them: blocked in all threads,
+/// Does one thing of a renewal; tells what it was, or why it stays as it was.
+template <typename Action>
+void renewed(const std::string& what, Action&& action) {
+    try {
+        std::forward<Action>(action)();
+        log(cimom::wbem::LogKind::notice, "read anew: " + what);
+    } catch (const std::exception& error) {
+        log(cimom::wbem::LogKind::failure, what + ": not read anew: " + error.what());
+    }
+}
+
+/// The signals that the server heeds, as sigwait wants them: blocked in all threads,
 /// which inherit this one's mask.
-sigset_t blockEndSignals() {
+sigset_t blockSignals() {
     sigset_t signals;
     sigemptyset(&signals);
     sigaddset(&signals, SIGTERM);
     sigaddset(&signals, SIGINT);
+    sigaddset(&signals, SIGHUP);
     const int error = ::pthread_sigmask(SIG_BLOCK, &signals, nullptr);
     if (error != 0) {
         throw Failure(ExitStatus::notLoaded, std::strerror(error));
@@ -161,6 +205,19 @@ class EndInTime {
     bool over_ = false;
     std::thread thread_;
 };
+
+/// Where lines are logged may have changed.
+void renewLogging() {
+    renewed("where lines are logged", [] {
+        const auto settings = ZR::PlatformSettings::read(
+            [](const char* name) -> const char* { return std::getenv(name); });
+        TKLog::TKLogger::configure({settings.logLevel, settings.logSink},
+                                   {settings.traceLevel, settings.traceSink});
+        for (const std::string& diagnostic : settings.diagnostics) {
+            log(cimom::wbem::LogKind::failure, diagnostic);
+        }
+    });
+}
 
 /// The families of the server itself.
 MetricFamilies serverMetrics(const cimom::wbem::Server& server,
@@ -202,13 +259,35 @@ cimom::wbem::ServerSettings settingsOf(const ServeCommand& command) {
         throw Failure(ExitStatus::usage, "--tls-cert and --tls-key belong together");
     }
     if (command.tlsCertificate) {
-        settings.tls.emplace(cimom::wbem::ServerSettings::Tls{pemText(*command.tlsCertificate),
-                                                              pemText(*command.tlsKey)});
+        settings.tls = tlsOf(command);
     }
     if (command.users) {
         settings.users = cimom::wbem::readUsers(*command.users);
     }
     return settings;
+}
+
+void renewListeners(const ServeCommand& command, const std::vector<cimom::wbem::Server*>& servers,
+                    const std::function<void(std::vector<cimom::wbem::User>)>& further) {
+    if (command.tlsCertificate) {
+        renewed("certificate and key", [&] {
+            const auto tls = tlsOf(command);
+            for (cimom::wbem::Server* const server : servers) {
+                server->renewTls(tls);
+            }
+        });
+    }
+    if (command.users) {
+        renewed("users", [&] {
+            auto users = cimom::wbem::readUsers(*command.users);
+            for (cimom::wbem::Server* const server : servers) {
+                server->renewUsers(users);
+            }
+            if (further) {
+                further(std::move(users));
+            }
+        });
+    }
 }
 
 cimom::wbem::ServerLog serverLog() {
@@ -251,7 +330,7 @@ Listening readListening(const std::string& text, const char* option) {
 
 void serve(const ServeCommand& command, cimom::ObjectManager& manager, AskMetrics ask,
            std::ostream& out) {
-    const sigset_t signals = blockEndSignals();
+    const sigset_t signals = blockSignals();
     try {
         // Shorter than service managers wait before they kill.
         constexpr std::chrono::seconds patience(5);
@@ -264,9 +343,11 @@ void serve(const ServeCommand& command, cimom::ObjectManager& manager, AskMetric
             log(cimom::wbem::LogKind::notice,
                 "the schema lacks CIM_ObjectManager: clients cannot find out what is served");
         }
+        const auto users =
+            settings.users ? std::make_shared<CurrentUsers>(*settings.users) : nullptr;
         std::unique_ptr<cimom::wbem::Subscriptions> subscriptions;
         if (manager.repository().find("CIM_IndicationFilter") != nullptr) {
-            subscriptions = subscriptionsOf(command, settings.users, manager);
+            subscriptions = subscriptionsOf(command, users, manager);
         } else {
             log(cimom::wbem::LogKind::notice,
                 "the schema lacks CIM_IndicationFilter: clients cannot subscribe");
@@ -274,12 +355,14 @@ void serve(const ServeCommand& command, cimom::ObjectManager& manager, AskMetric
         const cimom::wbem::ServerSettings forMetrics =
             command.metrics ? metricsSettings(settings, *command.metrics)
                             : cimom::wbem::ServerSettings();
-        const cimom::wbem::Server server(manager, std::move(settings), log);
+        cimom::wbem::Server server(manager, std::move(settings), log);
+        std::vector<cimom::wbem::Server*> servers{&server};
         std::unique_ptr<cimom::wbem::Server> metrics;
         if (command.metrics) {
             metrics = serveMetrics(
                 forMetrics, std::move(ask),
                 [&] { return serverMetrics(server, subscriptions.get()); }, log);
+            servers.push_back(metrics.get());
         }
         log(cimom::wbem::LogKind::notice, "listening on " + server.url());
         out << "Listening on " << server.url() << std::endl;
@@ -287,7 +370,16 @@ void serve(const ServeCommand& command, cimom::ObjectManager& manager, AskMetric
             out << "Metrics at " << metrics->url() << "metrics" << std::endl;
         }
         int signal = 0;
-        while (::sigwait(&signals, &signal) != 0) {
+        while (signal != SIGTERM && signal != SIGINT) {
+            if (::sigwait(&signals, &signal) == 0 && signal == SIGHUP) {
+                // First, since the rest is told there.
+                renewLogging();
+                renewListeners(command, servers,
+                               [&users](auto read) { users->renew(std::move(read)); });
+                log(cimom::wbem::LogKind::notice,
+                    "address, port, limits and everything else on the command line stay until a "
+                    "restart");
+            }
         }
         log(cimom::wbem::LogKind::notice, "ending by signal " + std::to_string(signal));
         end.emplace(patience);

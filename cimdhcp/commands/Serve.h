@@ -1,14 +1,17 @@
 #pragma once
 
 #include <cstdint>
+#include <functional>
 #include <optional>
 #include <ostream>
 #include <string>
+#include <vector>
 
 #include "arguments/Commands.h"
 #include "cimom/Forward.h"
 #include "commands/Metrics.h"
-#include "wbem/ServerSettings.h"
+#include "wbem/Server.h"
+#include "wbem/Users.h"
 
 namespace cimdhcp {
 
@@ -30,10 +33,15 @@ struct Listening {
 /// Where the lines of servers go: to the log channel.
 [[nodiscard]] cimom::wbem::ServerLog serverLog();
 
-/// Runs the WBEM server until the process gets SIGTERM or SIGINT, which it blocks
-/// in this thread. Prints one line when the server accepts connections, and another one when it
-/// serves metrics, for which `ask` asks the machine; logs the rest. Throws Failure when the
-/// server cannot start.
+/// Reads certificate, key and users anew, for all the servers of one command, and logs what came of
+/// it; `further` gets the users, too. What is wrong with one file keeps nothing else from it.
+void renewListeners(const ServeCommand& command, const std::vector<cimom::wbem::Server*>& servers,
+                    const std::function<void(std::vector<cimom::wbem::User>)>& further = nullptr);
+
+/// Runs the WBEM server until the process gets SIGTERM or SIGINT; at SIGHUP it reads
+/// certificate, key, users and the settings of logging anew. Blocks the three in this thread.
+/// Prints one line when the server accepts connections, and another one when it serves metrics,
+/// for which `ask` asks the machine; logs the rest. Throws Failure when the server cannot start.
 void serve(const ServeCommand& command, cimom::ObjectManager& manager, AskMetrics ask,
            std::ostream& out);
 

@@ -46,6 +46,13 @@ int widthOf(wchar_t unit) {
     return widths.of(unit);
 }
 
+/// Characters without a width that change how the text around them looks: marks of direction,
+/// which make it read in another order, and separators of lines.
+bool misleads(wchar_t unit) noexcept {
+    return unit == 0x0085 || unit == 0x061C || unit == 0x200E || unit == 0x200F ||
+           (unit >= 0x2028 && unit <= 0x202E) || (unit >= 0x2066 && unit <= 0x2069);
+}
+
 std::string escaped(wchar_t unit) {
     constexpr std::uint32_t firstStrayByte = 0xDC80;  // as ZR::make_wstring marks them
     constexpr std::uint32_t lastStrayByte = 0xDCFF;
@@ -99,7 +106,7 @@ std::size_t fitting(std::wstring_view text, std::size_t width) {
 std::string printable(std::string_view text) {
     std::string result;
     for (const wchar_t unit : ZR::make_wstring(text)) {
-        result += widthOf(unit) < 0 ? escaped(unit) : ZR::make_string({&unit, 1});
+        result += widthOf(unit) < 0 || misleads(unit) ? escaped(unit) : ZR::make_string({&unit, 1});
     }
     return result;
 }

@@ -9,7 +9,7 @@ namespace cimdhcp {
 
 /// The text as it can be shown to a person: control characters, which could steer
 /// a terminal, and bytes that are not UTF-8 become \xNN, other characters that
-/// cannot be printed \uNNNN or \UNNNNNNNN.
+/// cannot be printed, marks of direction and separators of lines \uNNNN or \UNNNNNNNN.
 [[nodiscard]] std::string printable(std::string_view text);
 
 /// How many columns a printable UTF-8 text takes; wide characters take two.

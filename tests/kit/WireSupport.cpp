@@ -112,14 +112,19 @@ std::string HttpResponse::header(const std::string& name) const {
     return "";
 }
 
-RawClient::RawClient(std::uint16_t port) : fd_(::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0)) {
+RawClient::RawClient(std::uint16_t port, const char* from)
+    : fd_(::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0)) {
     sockaddr_in address{};
     address.sin_family = AF_INET;
     address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
     address.sin_port = htons(port);
     // Nothing here takes that long, but a test must not hang.
     const timeval patience{10, 0};
-    if (fd_ < 0 || ::setsockopt(fd_, SOL_SOCKET, SO_RCVTIMEO, &patience, sizeof patience) != 0 ||
+    sockaddr_in own{};
+    own.sin_family = AF_INET;
+    own.sin_addr.s_addr = ::inet_addr(from);
+    if (fd_ < 0 || ::bind(fd_, reinterpret_cast<const sockaddr*>(&own), sizeof own) != 0 ||
+        ::setsockopt(fd_, SOL_SOCKET, SO_RCVTIMEO, &patience, sizeof patience) != 0 ||
         ::connect(fd_, reinterpret_cast<const sockaddr*>(&address), sizeof address) != 0) {
         throw std::system_error(errno, std::generic_category(), "connect");
     }

@@ -53,7 +53,8 @@ struct HttpResponse {
 /// A client that sends whatever a test wants to.
 class RawClient {
   public:
-    explicit RawClient(std::uint16_t port);
+    /// `from`: the loopback address that it has.
+    explicit RawClient(std::uint16_t port, const char* from = "127.0.0.1");
     ~RawClient();
     RawClient(RawClient&& other) noexcept : fd_(std::exchange(other.fd_, -1)) {}
     RawClient(const RawClient&) = delete;
@@ -64,6 +65,8 @@ class RawClient {
     /// The next response; none when the connection ends before it is whole. The body of
     /// a good one must be of the structure of DSP0203.
     std::optional<HttpResponse> receive();
+    /// Likewise, with any body, which may be compressed.
+    std::optional<HttpResponse> receiveAny();
     /// Waits until a response begins to arrive, and reads nothing of it.
     bool awaitResponse();
     /// Whether anything of a response arrives in that time; reads nothing of it.
@@ -72,7 +75,6 @@ class RawClient {
     bool waitForEnd();
 
   private:
-    std::optional<HttpResponse> receiveAny();
     std::optional<std::string> line();
     bool fill();
 
@@ -115,6 +117,8 @@ class TestServer {
     /// The response to an operation, which must have been carried out.
     wbem::XmlElement call(const std::string& method, const std::string& parameters,
                           const std::string& nameSpace = "root/test");
+    /// To change what can be changed while it runs.
+    [[nodiscard]] wbem::Server& running() noexcept { return server_; }
     /// What was logged of that kind so far.
     std::vector<std::string> log(wbem::LogKind kind);
 

@@ -45,12 +45,22 @@ names=$(for ((number = 1; number <= machines; number++)); do printf ',IP:127.0.1
 openssl req -x509 -newkey ec -pkeyopt ec_paramgen_curve:prime256v1 -nodes -days 2 -subj /CN=test \
     -addext "subjectAltName=IP:127.0.0.1$names" -keyout key.pem -out ca.pem 2>/dev/null
 echo secret | "$program" user add --users users scraper >/dev/null
-# Leases as of now, all but the one without an end.
-jq --argjson now "$(date +%s)" \
-    'walk(if type == "object" and .type == "DHCPLease" and .properties.LeaseExpires < 253402300799
-          then .properties += {LeaseObtained: $now, RenewalTime: ($now + 1800),
-                               RebindingTime: ($now + 3150), LeaseExpires: ($now + 3600)}
-          else . end)' "$tree" >tree.json
+# Leases as of now, all but the one without an end: most are good, and some machines ask, have
+# had a lease, or have one of a server that should not serve.
+leases() { # leases FILE PROPERTIES: of eth0
+    jq --argjson now "$(date +%s)" \
+        'walk(if type == "object" and .type == "DHCPLease" and .properties.LeaseExpires < 253402300799
+              then .properties += {LeaseObtained: $now, RenewalTime: ($now + 1800),
+                                   RebindingTime: ($now + 3150), LeaseExpires: ($now + 3600)}
+              else . end)
+         | .nodes[0].children[0].children[0].children |= [.[0] | .properties |= (. + '"$2"')]' \
+        "$tree" >"$1"
+}
+leases good.json '{}'
+leases asking.json '{ClientState: 2, Address: null, ServerAddress: null, LeaseExpires: null}
+    | del(..|nulls)'
+leases ended.json '{LeaseExpires: ($now - 600), LeaseObtained: ($now - 4200)}'
+leases rogue.json '{ServerAddress: "192.0.2.66"}'
 started() { # started NAME COMMAND...: prints where it listens
     "${@:2}" >"$1.log" 2>&1 &
     pids+=($!)
@@ -59,50 +69,69 @@ started() { # started NAME COMMAND...: prints where it listens
         sleep 0.05
     done
 }
-tls=(--tls-cert ca.pem --tls-key key.pem --users users)
-started fleet-metrics "$program" --tree tree.json serve --listen 0.0.0.0:0 --metrics 127.0.0.1:0 \
-    "${tls[@]}"
-port=$(sed -n 's#^Listening on https://0.0.0.0:\([0-9]*\)/cimom$#\1#p' fleet-metrics.log)
-direct=$(sed -n 's#^Metrics at https://\(.*\)/metrics$#\1#p' fleet-metrics.log)
+# All machines are one server, and all their clients are one.
+tls=(--tls-cert ca.pem --tls-key key.pem --users users --max-connections-each 512
+    --max-checks-each 512 --max-connection-rate 1000)
+declare -A ports
+for kind in good asking ended rogue; do
+    started $kind-metrics "$program" --tree $kind.json serve --listen 0.0.0.0:0 \
+        --metrics 127.0.0.1:0 "${tls[@]}"
+    ports[$kind]=$(sed -n 's#^Listening on https://0.0.0.0:\([0-9]*\)/cimom$#\1#p' $kind-metrics.log)
+done
+direct=$(sed -n 's#^Metrics at https://\(.*\)/metrics$#\1#p' good-metrics.log)
 started own-metrics "$program" serve --listen 127.0.0.1:0 --metrics 127.0.0.1:0
 own=$(sed -n 's#^Metrics at http://\(.*\)/metrics$#\1#p' own-metrics.log)
-hosts=127.0.1.1
-for ((number = 2; number <= machines; number++)); do
-    hosts+=" 127.0.1.$number"
-done
-for host in $hosts; do
-    echo "machine $host login scraper password secret"
+targets=()
+for ((number = 1; number <= machines; number++)); do
+    case $number in
+        [1-9] | 10) kind=asking ;;
+        1[1-4]) kind=ended ;;
+        1[5-9] | 20) kind=rogue ;;
+        *) kind=good ;;
+    esac
+    targets+=("https://127.0.1.$number:${ports[$kind]}")
+    echo "machine 127.0.1.$number login scraper password secret"
 done >credentials
 chmod 600 credentials
-jq -n --arg target "https://127.0.1.*:$port" --arg directory "$directory" \
-    '{cacert: ($directory + "/ca.pem"), credentials: ($directory + "/credentials"),
-      targets: [$target]}' >exporter.json
+printf 'https://127.0.1.*:%s\n' "${ports[@]}" |
+    jq -R . | jq -s --arg directory "$directory" \
+    '{cacert: ($directory + "/ca.pem"), credentials: ($directory + "/credentials"), targets: .}' \
+    >exporter.json
 "$program" exporter --check --config exporter.json
 started exporter "$program" exporter --config exporter.json --listen 127.0.0.1:0
 exporter=$(sed -n 's#^Listening on http://\(.*\)/$#\1#p' exporter.log)
 
 interval=15
+cat >servers.yml <<'TEXT'
+groups:
+  - name: expected-dhcp-servers
+    rules:
+      - {record: dhcp_expected_server, expr: vector(1), labels: {server: 192.0.2.1}}
+      - {record: dhcp_expected_server, expr: vector(1), labels: {server: 198.51.100.1}}
+TEXT
 {
     cat <<TEXT
-global: {scrape_interval: ${interval}s, scrape_timeout: ${interval}s, evaluation_interval: ${interval}s}
-rule_files: [$monitoring/alerts.yml]
+global: {scrape_interval: ${interval}s, scrape_timeout: ${interval}s, evaluation_interval: 1s}
+rule_files: [$monitoring/alerts.yml, servers.yml]
 scrape_configs:
   - job_name: dhcp-clients
     metrics_path: /probe
     static_configs:
       - targets:
 TEXT
-    for host in $hosts; do
-        echo "          - https://$host:$port"
-    done
+    printf '          - %s\n' "${targets[@]}"
     cat <<TEXT
     relabel_configs:
       - {source_labels: [__address__], target_label: __param_target}
       - {source_labels: [__param_target], target_label: instance}
       - {target_label: __address__, replacement: '$exporter'}
   - job_name: dhcp-exporter
+    scrape_interval: 2s
+    scrape_timeout: 2s
     static_configs: [{targets: ['$exporter']}]
   - job_name: dhcp-clients-direct
+    scrape_interval: 2s
+    scrape_timeout: 2s
     scheme: https
     tls_config: {ca_file: ca.pem}
     basic_auth: {username: scraper, password: secret}
@@ -121,23 +150,30 @@ query() { # query EXPRESSION: the result as JSON
         "http://127.0.0.1:$free/api/v1/query"
 }
 value() { query "$1" 2>/dev/null | jq -r '.data.result[0].value[1] // "0"' 2>/dev/null || echo 0; }
-# Prometheus spreads targets over the interval: all have been asked for when two are over.
+# Prometheus spreads targets over the interval. A rate needs two samples.
 patience=$((SECONDS + 120))
-until [[ $(value 'count(count_over_time(up[1h]) >= 2)') == $((machines + 3)) ]]; do
+rogue='count(ALERTS{alertname="DHCPUnexpectedServer", alertstate="firing", job="dhcp-clients"})'
+until [[ $(value 'sum(up)') == $((machines + 3)) && $(value 'sum(probe_success)') == "$machines" &&
+    $(value "$rogue") == 6 &&
+    $(value 'count(count_over_time(up{job=~"dhcp-exporter|dhcp-clients-direct"}[1h]) >= 2)') == 2 ]]; do
     kill -0 "${pids[-1]}" 2>/dev/null || fail "Prometheus has ended"
-    ((SECONDS < patience)) || fail "not all was scraped: $(query 'count by (job) (up)')"
-    sleep 0.5
+    ((SECONDS < patience)) || break
+    sleep 0.2
 done
-expect() { # expect EXPRESSION: it holds
-    [[ $(query "$1" | jq '.data.result | length') -gt 0 ]] ||
-        fail "not so: $1: $(query "${1%% [<>=]*}")"
-    echo "ok: $1"
+expect() { # expect EXPRESSION COMPARISON: it holds
+    [[ $(query "$1 $2" | jq '.data.result | length') -gt 0 ]] ||
+        fail "not $2: $1: $(value "$1"), probes took up to $(value 'max(probe_duration_seconds)') s"
+    echo "ok: $1 $2"
 }
-expect "count(probe_success == 1) == $machines"
-expect "sum(up) == $machines + 3"
-expect "max(scrape_duration_seconds) < $interval"
-expect 'cimdhcp_exporter_resident_memory_bytes < 64 * 1024 * 1024'
-expect 'count(dhcp_client_state{state="bound", interface="eth0"} == 1) >= 200'
+expect 'sum(up)' "== $machines + 3"
+expect 'sum(probe_success)' "== $machines"
+expect 'max(scrape_duration_seconds)' "< $interval"
+expect 'cimdhcp_exporter_resident_memory_bytes' '< 64 * 1024 * 1024'
+state() { echo "sum(dhcp_client_state{job=\"dhcp-clients\", interface=\"eth0\", state=\"$1\"})"; }
+expect "$(state asking)" '== 10'
+expect "$(state expired)" '== 4'
+expect "$(state bound)" "== $machines - 14"
+expect "$rogue" '== 6'
 echo "exporter: $(value cimdhcp_exporter_resident_memory_bytes) bytes," \
     "longest probe $(value 'max(probe_duration_seconds)') s"
 

@@ -92,9 +92,9 @@ ReadMessage readMessage(XmlElement cim) {
     return read;
 }
 
-Call readCall(std::string_view body, std::size_t maximumDepth) {
+Call readCall(std::string_view body, std::size_t maximumDepth, std::size_t maximumMemory) {
     try {
-        return callOf(readMessage(readXml(body, maximumDepth)));
+        return callOf(readMessage(readXml(body, maximumDepth, maximumMemory)));
     } catch (const XmlError& error) {
         throw HttpFailure(http::badRequest, "request-not-well-formed", error.what());
     } catch (const NotValid& error) {

@@ -145,7 +145,7 @@ Scalar readEmbedded(const std::string& text, unsigned embedding, const std::stri
                        name + ": instances are embedded too deep in each other");
     }
     try {
-        const XmlElement inner = readXml(text, embeddedDepth);
+        const XmlElement inner = readXml(text, embeddedDepth, usualMemory(text.size()));
         return std::make_shared<const Instance>(readInstanceAt(inner, embedding + 1));
     } catch (const XmlError& error) {
         throw CimError(CimStatus::invalidParameter, name + ": embedded instance, " + error.what());

@@ -69,6 +69,31 @@ TEST(OptionRules, SaysHowToWatch) {
     EXPECT_EQ(line({"profiles", "--sort", "version"}).options.sort, "version");
 }
 
+TEST(OptionRules, SaysWhereMetricsAre) {
+    const auto metrics = [](const std::vector<std::string>& arguments) {
+        return std::get<ServeCommand>(line(arguments).command).metrics;
+    };
+    EXPECT_EQ(metrics({"serve"}), std::nullopt);
+    EXPECT_EQ(metrics({"serve", "--metrics"}), "");
+    EXPECT_EQ(metrics({"serve", "--metrics", "--read-only"}), "");
+    EXPECT_EQ(metrics({"serve", "--metrics", "[::1]:9", "--read-only"}), "[::1]:9");
+    EXPECT_EQ(metrics({"serve", "--metrics=[::1]"}), "[::1]");
+    EXPECT_EQ(line({"metrics"}).command, Command(MetricsCommand{}));
+    EXPECT_EQ(line({"--connect", "h", "metrics", "--output", "f"}).command,
+              Command(MetricsCommand{"f"}));
+    for (const char* option : {"--count", "--sort=STATE", "--format=json", "--format=mof"}) {
+        EXPECT_NE(lineRefusal({"metrics", option}), "accepted") << option;
+    }
+    ExporterCommand exporter;
+    exporter.config = "c";
+    exporter.server.listen = "[::1]:9";
+    exporter.check = true;
+    EXPECT_EQ(line({"exporter", "--check", "--config", "c", "--listen", "[::1]:9"}).command,
+              Command(exporter));
+    EXPECT_NE(lineRefusal({"exporter"}), "accepted");
+    EXPECT_NE(lineRefusal({"exporter", "--config", "c", "--connect", "h"}), "accepted");
+}
+
 TEST(OptionRules, AnAddressInBracketsKeepsThem) {
     const std::vector<std::string> servers{"[::1]", "[::1]:5988", "[a,b]"};
     EXPECT_EQ(line({"--connect", "[::1]", "--connect=[::1]:5988", "--connect=[a,b]", "show"})
@@ -166,12 +191,36 @@ TEST(ServeOptions, EachLimitIsItsOwn) {
     serve.limits.response = std::chrono::seconds(13);
     serve.limits.sessions.defaultTimeout = std::chrono::seconds(14);
     serve.limits.sessions.longestTimeout = std::chrono::seconds(15);
+    serve.limits.connectionsEach = 16;
+    serve.limits.connectionRate = 17;
+    serve.limits.checksEach = 18;
+    serve.limits.refusalsEach = 19;
+    serve.limits.memory = 20;
+    serve.limits.sessions.each = 21;
+    serve.limits.head = std::chrono::seconds(22);
     std::vector<std::string> arguments;
-    for (const char* option :
-         {"--max-header-line", "--max-headers", "--max-body", "--max-depth", "--max-connections",
-          "--max-waiting", "--max-enumerations", "--max-result", "--workers", "--max-stuck",
-          "--io-threads", "--request-timeout", "--answer-timeout", "--enumeration-timeout",
-          "--max-enumeration-timeout"}) {
+    for (const char* option : {"--max-header-line",
+                               "--max-headers",
+                               "--max-body",
+                               "--max-depth",
+                               "--max-connections",
+                               "--max-waiting",
+                               "--max-enumerations",
+                               "--max-result",
+                               "--workers",
+                               "--max-stuck",
+                               "--io-threads",
+                               "--request-timeout",
+                               "--answer-timeout",
+                               "--enumeration-timeout",
+                               "--max-enumeration-timeout",
+                               "--max-connections-each",
+                               "--max-connection-rate",
+                               "--max-checks-each",
+                               "--max-refusals-each",
+                               "--max-memory",
+                               "--max-enumerations-each",
+                               "--head-timeout"}) {
         arguments.emplace_back(option);
         arguments.push_back(std::to_string(arguments.size() / 2 + 1));
     }

@@ -84,6 +84,19 @@ class MetricsProgram : public test::ProgramTest {
     }
 };
 
+/// Waits until something is so, as long as a loaded machine may take.
+template <typename Condition>
+bool soon(const Condition& condition) {
+    const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(60);
+    while (!condition()) {
+        if (std::chrono::steady_clock::now() > end) {
+            return false;
+        }
+        std::this_thread::sleep_for(std::chrono::milliseconds(10));
+    }
+    return true;
+}
+
 /// The page without the line of its status, which must be 200.
 std::string pageOf(const std::string& got) {
     EXPECT_THAT(got, EndsWith("\n200"));
@@ -170,6 +183,14 @@ TEST_F(MetricsProgram, OfAServerNeedItsUsersAndAreEncryptedLikeIt) {
     EXPECT_THAT(get(url, {"--cacert", trusted}), EndsWith("\n401"));
     const std::string page = pageOf(get(url, {"--cacert", trusted, "--user", "bob:pass-bob"}));
     EXPECT_THAT(page, HasSubstr("\ndhcp_client_up 1\n"));
+    // Who may use the server may use this, also when that has changed.
+    const Ended added = runAs(
+        "/bin/sh", {"-c", "echo pass-eve | " + program() + " user add --users " + users + " eve"});
+    ASSERT_EQ(added.status, 0) << added.err;
+    ::kill(server->process(), SIGHUP);
+    EXPECT_TRUE(soon([&] {
+        return get(url, {"--cacert", trusted, "--user", "eve:pass-eve"}).ends_with("\n200");
+    }));
     // Where other machines reach it, it needs both.
     EXPECT_EQ(run({"serve", "--listen", "127.0.0.1:0", "--metrics", "0.0.0.0:0"}).status, 3);
     EXPECT_EQ(run({"serve", "--metrics", "here:x"}).status, 2);
@@ -289,15 +310,9 @@ TEST_F(MetricsProgram, OfATargetThatSendsGarbageAreAFailure) {
 TEST_F(MetricsProgram, OfTheExporterFollowItsConfiguration) {
     const auto exporter = startExporter(R"({"targets": ["http://127.0.0.1:1"]})");
     const auto await = [&](const std::string& line) {
-        // As long as a loaded machine may take; each step only looks whether it is there.
-        const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(60);
-        while (std::chrono::steady_clock::now() < end) {
-            if (get(exporter->url() + "/metrics").find('\n' + line + '\n') != std::string::npos) {
-                return true;
-            }
-            std::this_thread::sleep_for(std::chrono::milliseconds(10));
-        }
-        return false;
+        return soon([&] {
+            return get(exporter->url() + "/metrics").find('\n' + line + '\n') != std::string::npos;
+        });
     };
     configure(R"({"targets": ["http://127.0.0.1:2", "http://127.0.0.1:3"]})");
     ::kill(exporter->process(), SIGHUP);

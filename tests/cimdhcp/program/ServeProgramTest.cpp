@@ -1,8 +1,13 @@
 // The server as clients of other makers see it: wbemcli and curl.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <sys/stat.h>
 
+#include <chrono>
+#include <csignal>
+#include <filesystem>
 #include <memory>
+#include <thread>
 
 #include "ProgramRun.h"
 #include "ServedProgram.h"
@@ -57,6 +62,29 @@ class Serve : public test::ProgramTest {
     }
 
     [[nodiscard]] std::string log() const { return ZR::Testing::readFile(directory() / "log"); }
+
+    /// Waits until the log has a text behind that many bytes; all of what is there then.
+    [[nodiscard]] std::string awaitLog(const std::string& text, std::size_t from) const {
+        constexpr int rounds = 3000;
+        constexpr std::chrono::milliseconds between(10);
+        std::string lines;
+        for (int round = 0; round < rounds; ++round) {
+            lines = log().substr(from);
+            if (lines.find(text) != std::string::npos) {
+                return lines;
+            }
+            std::this_thread::sleep_for(between);
+        }
+        ADD_FAILURE() << "no \"" << text << "\" in " << lines;
+        return lines;
+    }
+
+    /// Has the server read its files anew; the lines that it logs about it.
+    [[nodiscard]] std::string reload() const {
+        const std::size_t before = log().size();
+        EXPECT_EQ(::kill(server_->process(), SIGHUP), 0);
+        return awaitLog("stay until a restart", before);
+    }
 
     std::string certificate() const {
         const Ended made = runAs(
@@ -213,6 +241,86 @@ TEST_F(Serve, TlsIsWhatItShouldBe) {
     EXPECT_NE(plain.status, 0);
 }
 
+// Takes some 2 s: a wrong password is refused after one.
+TEST_F(Serve, ReadsCertificateKeyAndUsersAnew) {
+    const std::string users = usersFile();
+    const std::string key = directory() / "key.pem";
+    std::string served = certificate();
+    serve({"--tls-cert", served, "--tls-key", key, "--users", users});
+    // The certificate is its own authority: only the served one is believed.
+    const std::string known = directory() / "known.pem";
+    const auto status = [&](const std::string& user) {
+        return runAs("/usr/bin/curl", {"-s",
+                                       "-o",
+                                       "/dev/null",
+                                       "-w",
+                                       "%{http_code}",
+                                       "--cacert",
+                                       known,
+                                       "-u",
+                                       user,
+                                       "-H",
+                                       "CIMOperation: MethodCall",
+                                       "-H",
+                                       "CIMMethod: GetClass",
+                                       "-H",
+                                       "CIMObject: root/cimv2",
+                                       "-H",
+                                       "Content-Type: application/xml",
+                                       "-d",
+                                       "<CIM",
+                                       server_->url() + "/cimom"})
+            .out;
+    };
+    std::filesystem::copy_file(served, known);
+    // Past the users, a body that is no XML is refused.
+    EXPECT_EQ(status("ada:pass-ada"), "400");
+
+    served = certificate();
+    ZR::Testing::writeFile(users, "broken\n");
+    EXPECT_EQ(status("ada:pass-ada"), "400");
+    const std::string first = reload();
+    EXPECT_THAT(first, HasSubstr("read anew: certificate and key"));
+    EXPECT_THAT(first, HasSubstr("users: not read anew: " + users +
+                                 ": line 1: not of the form NAME:ROLE:HASH"));
+    EXPECT_EQ(status("ada:pass-ada"), "000");  // not the certificate that it knows
+    std::filesystem::copy_file(served, known, std::filesystem::copy_options::overwrite_existing);
+    EXPECT_EQ(status("ada:pass-ada"), "400");
+
+    std::filesystem::remove(users);
+    EXPECT_EQ(
+        runAs("/bin/sh", {"-c", "echo new | " + program() + " user add --users " + users + " ada"})
+            .status,
+        0);
+    ZR::Testing::writeFile(served, "broken\n");
+    const std::string second = reload();
+    EXPECT_THAT(second, HasSubstr("read anew: users"));
+    EXPECT_THAT(second, HasSubstr("certificate and key: not read anew: TLS certificate: "));
+    EXPECT_EQ(status("ada:new"), "400");
+    EXPECT_EQ(status("ada:pass-ada"), "401");
+
+    // Where it logs is read anew, too: after a file was moved away, a new one is begun.
+    std::filesystem::rename(directory() / "log", directory() / "log.1");
+    ZR::Testing::writeFile(directory() / "log", "");
+    EXPECT_THAT(reload(), HasSubstr("read anew: where lines are logged"));
+    EXPECT_EQ(server_->end(), 0);
+}
+
+TEST_F(Serve, RefusesAKeyThatOthersCanRead) {
+    const std::string certificateFile = certificate();
+    const std::string key = directory() / "key.pem";
+    for (const unsigned mode : {0604U, 0660U, 0601U}) {
+        ASSERT_EQ(::chmod(key.c_str(), mode), 0);
+        EXPECT_EQ(run({"serve", "--tls-cert", certificateFile, "--tls-key", key}),
+                  (Ended{3, "",
+                         "cimdhcp: " + key +
+                             ": may be read or written by others; \"chmod 640\" mends that\n"}));
+    }
+    ASSERT_EQ(::chmod(key.c_str(), 0640), 0);
+    serve({"--tls-cert", certificateFile, "--tls-key", key});
+    EXPECT_EQ(server_->end(), 0);
+}
+
 TEST_F(Serve, EndsBySignalInGoodOrder) {
     serve();
     EXPECT_EQ(server_->end(), 0);
@@ -275,6 +383,18 @@ TEST_F(UserAdd, MakesAFileWithoutThePassword) {
     EXPECT_THAT(text, testing::Not(HasSubstr("geheim")));
     EXPECT_EQ(std::filesystem::status(directory() / "users").permissions(),
               std::filesystem::perms::owner_read | std::filesystem::perms::owner_write);
+}
+
+TEST_F(UserAdd, TakesSeveralAtOnce) {
+    const std::string users = directory() / "users";
+    EXPECT_EQ(runAs("/bin/sh", {"-c", "for user in a b c d e f g h; do echo x | " + program() +
+                                          " user add --users " + users + " $user & done; wait"})
+                  .status,
+              0);
+    const std::string text = ZR::Testing::readFile(users);
+    for (const char* user : {"a", "b", "c", "d", "e", "f", "g", "h"}) {
+        EXPECT_THAT(text, HasSubstr(std::string("\n") + user + ":read:$y$"));
+    }
 }
 
 TEST_F(UserAdd, RefusesWhatCannotBe) {

@@ -35,6 +35,11 @@ TEST(DisplayText, KeepsPrintableText) {
 TEST(DisplayText, EscapesWhatCouldSteerATerminal) {
     EXPECT_EQ(printable("a\x1B[31mb\n\x7F"), "a\\x1B[31mb\\x0A\\x7F");
     EXPECT_EQ(printable("\xC2\x9B"), "\\u009B");
+    // Marks of direction and separators of lines have no width, and mislead a reader.
+    EXPECT_EQ(printable("a\u202Eb\u2066c\u200F"), "a\\u202Eb\\u2066c\\u200F");
+    EXPECT_EQ(printable("a\u2028b\u2029\u061C"), "a\\u2028b\\u2029\\u061C");
+    EXPECT_EQ(printable("\xC2\x85"), "\\u0085");
+    EXPECT_EQ(printable("\u200D\u2026\u2030"), "\u200D\u2026\u2030");
     EXPECT_EQ(printable(std::string_view("a\0b", 3)), "a\\x00b");
 }
 

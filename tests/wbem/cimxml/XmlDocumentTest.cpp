@@ -46,6 +46,31 @@ TEST(XmlDocument, KeepsManySiblingsApart) {
     EXPECT_EQ(element.children[999].children.at(0).text, "999");
 }
 
+TEST(XmlDocument, RefusesElementsThatAreTooManyForItsLength) {
+    constexpr std::size_t length = 1U << 20U;
+    const auto reason = [](const std::string& element) {
+        std::string text = "<a>";
+        while (text.size() + element.size() + 4 <= length) {
+            text += element;
+        }
+        text += "</a>";
+        try {
+            return std::to_string(readXml(text, 8, usualMemory(text.size())).children.size());
+        } catch (const XmlError& error) {
+            return std::string(error.what());
+        }
+    };
+    EXPECT_EQ(reason("<A/>"), "line 1: the elements are too many for their length");
+    EXPECT_EQ(reason("<A b='' c=''/>"), "line 1: the elements are too many for their length");
+    EXPECT_EQ(reason("<A><B><C>x</C></B></A>"),
+              "line 1: the elements are too many for their length");
+    // The shortest that CIM-XML has in numbers.
+    EXPECT_EQ(reason("<VALUE>1</VALUE>"), "65535");
+    EXPECT_EQ(reason("<V>" + std::string(100'000, 'x') + "</V>"), "10");
+    // Without a bound, they are read.
+    EXPECT_EQ(readXml("<a><b/><b/></a>", 8).children.size(), 2U);
+}
+
 TEST(XmlDocument, RefusesWhatIsNotWellFormed) {
     EXPECT_EQ(reasonOf(""), "line 1: no element found");
     EXPECT_EQ(reasonOf("<a>\n</b>"), "line 2: mismatched tag");

@@ -31,6 +31,15 @@ std::string reasonOf(const std::string& response) {
     return reason(server.url());
 }
 
+TEST(Deadline, LeavesNoMoreThanThePatienceAndNeverLessThanNothing) {
+    const Deadline far(std::chrono::hours(1));
+    EXPECT_EQ(far.patience(), std::chrono::hours(1));
+    EXPECT_LE(far.left(), std::chrono::hours(1));
+    EXPECT_GT(far.left(), std::chrono::minutes(1));
+    EXPECT_EQ(Deadline(milliseconds(0)).left(), milliseconds(0));
+    EXPECT_EQ(Deadline(milliseconds(-5000)).left(), milliseconds(0));
+}
+
 TEST(HttpConnection, PostsAndTakesTheResponse) {
     const ::test::RawServer server({::test::httpResponse("<x/>", "200 OK", "X-Thing:  a: b \r\n")});
     HttpConnection connection(readHttpUrl(server.url()), {}, Deadline(patience));

@@ -71,7 +71,7 @@ std::optional<Credentials> readBasic(std::string_view authorization) {
 }  // namespace
 
 Authenticator::Authenticator(std::vector<User> users, std::function<Clock::time_point()> now)
-    : users_(std::move(users)), now_(std::move(now)), dummyHash_(hashPassword("nobody's")) {
+    : now_(std::move(now)), dummyHash_(hashPassword("nobody's")), users_(std::move(users)) {
     if (gnutls_rnd(GNUTLS_RND_KEY, key_.data(), key_.size()) != GNUTLS_E_SUCCESS) {
         throw std::runtime_error("there are no random numbers");
     }
@@ -86,10 +86,17 @@ Authenticator::Digest Authenticator::digest(std::string_view authorization) cons
     return made;
 }
 
-const User* Authenticator::find(std::string_view name) const noexcept {
+std::optional<User> Authenticator::find(std::string_view name) const {
+    const std::lock_guard lock(mutex_);
     const auto found = std::find_if(users_.begin(), users_.end(),
                                     [name](const User& user) { return user.name == name; });
-    return found == users_.end() ? nullptr : &*found;
+    return found == users_.end() ? std::nullopt : std::optional(*found);
+}
+
+void Authenticator::renew(std::vector<User> users) {
+    const std::lock_guard lock(mutex_);
+    users_ = std::move(users);
+    memory_.clear();
 }
 
 std::optional<Identity> Authenticator::remembered(std::string_view authorization) {
@@ -108,10 +115,9 @@ std::optional<Identity> Authenticator::check(std::string_view authorization) {
     if (!credentials) {
         return std::nullopt;
     }
-    const User* const user = find(credentials->user);
-    const bool right =
-        passwordMatches(credentials->password, user == nullptr ? dummyHash_ : user->hash);
-    if (user == nullptr || !right) {
+    const std::optional<User> user = find(credentials->user);
+    const bool right = passwordMatches(credentials->password, user ? user->hash : dummyHash_);
+    if (!user || !right) {
         return std::nullopt;
     }
     Identity identity{user->name, user->role};
@@ -119,7 +125,9 @@ std::optional<Identity> Authenticator::check(std::string_view authorization) {
     const auto now = now_();
     const std::lock_guard lock(mutex_);
     std::erase_if(memory_, [now](const auto& entry) { return entry.second.end <= now; });
-    if (memory_.size() < mostMemories) {
+    // The users may have been renewed meanwhile: what was right before is not remembered.
+    const bool known = std::find(users_.begin(), users_.end(), *user) != users_.end();
+    if (known && memory_.size() < mostMemories) {
         memory_.insert_or_assign(key, Memory{identity, now + memoryTime});
     }
     return identity;
@@ -127,8 +135,8 @@ std::optional<Identity> Authenticator::check(std::string_view authorization) {
 
 std::string Authenticator::claimedUser(std::string_view authorization) const {
     const auto credentials = readBasic(authorization);
-    const User* const user = credentials ? find(credentials->user) : nullptr;
-    return user == nullptr ? "an unknown user" : "user " + user->name;
+    const std::optional<User> user = credentials ? find(credentials->user) : std::nullopt;
+    return user ? "user " + user->name : "an unknown user";
 }
 
 }  // namespace cimom::wbem

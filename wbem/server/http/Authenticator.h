@@ -34,6 +34,9 @@ class Authenticator {
     explicit Authenticator(std::vector<User> users,
                            std::function<Clock::time_point()> now = Clock::now);
 
+    /// Knows other users from now on, and forgets what was right.
+    void renew(std::vector<User> users);
+
     /// The identity of credentials that were right a short time ago. Quick.
     [[nodiscard]] std::optional<Identity> remembered(std::string_view authorization);
 
@@ -56,13 +59,13 @@ class Authenticator {
     };
 
     [[nodiscard]] Digest digest(std::string_view authorization) const;
-    [[nodiscard]] const User* find(std::string_view name) const noexcept;
+    [[nodiscard]] std::optional<User> find(std::string_view name) const;
 
-    const std::vector<User> users_;
     const std::function<Clock::time_point()> now_;
     std::array<unsigned char, 32> key_{};
     std::string dummyHash_;  ///< what passwords of unknown users are compared with
-    std::mutex mutex_;
+    mutable std::mutex mutex_;
+    std::vector<User> users_;
     std::map<Digest, Memory> memory_;
     std::atomic<std::uint64_t> refusals_{0};
 };

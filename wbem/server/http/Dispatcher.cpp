@@ -1,5 +1,6 @@
 #include "http/Dispatcher.h"
 
+#include <algorithm>
 #include <utility>
 
 #include "cimxml/Call.h"
@@ -7,14 +8,36 @@
 
 namespace cimom::wbem {
 
+namespace {
+
+/// What a response takes, of which one piece is in memory and another waits in its spool.
+constexpr std::size_t responseMemory = 131072;
+
+}  // namespace
+
+class Dispatcher::Turn {
+  public:
+    Turn(AddressShares& shares, const AddressKey& key) : shares_(shares), key_(key) {}
+    ~Turn() { shares_.endCheck(key_); }
+    Turn(const Turn&) = delete;
+    Turn& operator=(const Turn&) = delete;
+
+  private:
+    AddressShares& shares_;
+    const AddressKey key_;
+};
+
 Dispatcher::Dispatcher(ObjectManager* manager, const PageHandler& pages,
-                       const ServerSettings& settings, const ServerLog& log, ServerCounts& counts)
+                       const ServerSettings& settings, const ServerLog& log, AddressShares& shares,
+                       ServerCounts& counts)
     : pages_(pages),
       settings_(settings),
       log_(log),
       counts_(counts),
+      shares_(shares),
+      checks_(settings.limits.waiting),
       workers_(settings.limits.workers, settings.limits.waiting, settings.limits.stuck),
-      gate_(1, settings.limits.waiting),
+      gate_(1, settings.limits.waiting + 1),
       timers_(1, settings.limits.waiting) {
     if (manager != nullptr) {
         operations_.emplace(*manager, settings.limits, [&log](const Modification& modification) {
@@ -26,28 +49,45 @@ Dispatcher::Dispatcher(ObjectManager* manager, const PageHandler& pages,
     }
 }
 
-void Dispatcher::dispatch(const SharedExchange& exchange) {
-    if (!authenticator_) {
-        const Caller caller{std::nullopt, exchange->address(), !settings_.readOnly};
-        runOrRefuse(workers_, exchange, [this, exchange, caller] { work(exchange, caller); });
-        return;
+bool Dispatcher::isRemembered(Exchange& exchange) {
+    auto identity = authenticator_->remembered(*exchange.headers->authorization);
+    if (!identity) {
+        return false;
     }
-    if (auto identity = authenticator_->remembered(*exchange->headers->authorization)) {
-        admit(exchange, *identity);
-        return;
-    }
-    // Checking a password is slow, on purpose: one at a time, so that wrong ones
-    // leave the workers to those who have been admitted.
-    runOrRefuse(gate_, exchange, [this, exchange] { checkPassword(exchange); });
+    exchange.setIdentity(*std::move(identity));
+    shares_.admitted(exchange.key());
+    return true;
 }
 
-void Dispatcher::checkPassword(const SharedExchange& exchange) {
-    const std::string& authorization = *exchange->headers->authorization;
+void Dispatcher::authenticate(const SharedExchange& exchange) {
+    if (!shares_.beginCheck(exchange->key())) {
+        log_(LogKind::request, exchange->address() + ": too many of its passwords are checked");
+        exchange->finish(HttpResponse::failure(http::serviceUnavailable));
+        return;
+    }
+    const auto turn = std::make_shared<Turn>(shares_, exchange->key());
+    // Checking a password is slow, on purpose: one at a time, so that wrong ones leave the
+    // workers to those who have been admitted. Each in the queue has a task of the gate, which
+    // takes not that one, but the one whose turn it is.
+    if (checks_.push(exchange->key(), shares_.isKnown(exchange->key()),
+                     [this, exchange, turn] { checkPassword(exchange, turn); })) {
+        runOrRefuse(gate_, exchange, [this] { checks_.pop()(); });
+    } else {
+        log_(LogKind::request, exchange->address() + ": too many passwords are checked");
+        exchange->finish(HttpResponse::failure(http::serviceUnavailable));
+    }
+}
+
+void Dispatcher::checkPassword(const SharedExchange& exchange, const std::shared_ptr<Turn>& turn) {
+    if (exchange->isFinished()) {
+        return;
+    }
     try {
-        if (const auto identity = authenticator_->check(authorization)) {
-            admit(exchange, *identity);
+        if (auto identity = authenticator_->check(*exchange->headers->authorization)) {
+            shares_.admitted(exchange->key());
+            exchange->giveBack(*std::move(identity));
         } else {
-            refuse(exchange, authenticator_->claimedUser(authorization));
+            refuse(exchange, turn);
         }
     } catch (const std::exception& error) {
         log_(LogKind::failure, error.what());
@@ -55,25 +95,33 @@ void Dispatcher::checkPassword(const SharedExchange& exchange) {
     }
 }
 
-void Dispatcher::admit(const SharedExchange& exchange, const Identity& identity) {
-    const Caller caller{identity.name, exchange->address(),
-                        identity.role == Role::modify && !settings_.readOnly};
+void Dispatcher::refuse(const SharedExchange& exchange, const std::shared_ptr<Turn>& turn) {
+    shares_.refused(exchange->key());
+    counts_.credentialsRefused();
+    log_(LogKind::refusal, "refused " +
+                               authenticator_->claimedUser(*exchange->headers->authorization) +
+                               " from " + exchange->address() + ", refusal number " +
+                               std::to_string(authenticator_->countRefusal()));
+    if (!timers_.runAfter(settings_.refusalDelay,
+                          [exchange, turn] { exchange->finish(HttpResponse::refusal()); })) {
+        exchange->finish(HttpResponse::failure(http::serviceUnavailable));
+    }
+}
+
+void Dispatcher::dispatch(const SharedExchange& exchange) {
+    Caller caller{std::nullopt, exchange->address(), !settings_.readOnly};
+    if (const auto identity = exchange->identity()) {
+        caller.user = identity->name;
+        caller.mayModify = caller.mayModify && identity->role == Role::modify;
+    } else {
+        shares_.admitted(exchange->key());
+    }
     runOrRefuse(workers_, exchange, [this, exchange, caller] { work(exchange, caller); });
 }
 
 void Dispatcher::runOrRefuse(TaskPool& pool, const SharedExchange& exchange, TaskPool::Task task) {
     if (!pool.run(std::move(task))) {
         log_(LogKind::failure, "too many requests wait for a worker, or no worker comes back");
-        exchange->finish(HttpResponse::failure(http::serviceUnavailable));
-    }
-}
-
-void Dispatcher::refuse(const SharedExchange& exchange, const std::string& who) {
-    counts_.credentialsRefused();
-    log_(LogKind::refusal, "refused " + who + " from " + exchange->address() + ", refusal number " +
-                               std::to_string(authenticator_->countRefusal()));
-    if (!timers_.runAfter(settings_.refusalDelay,
-                          [exchange] { exchange->finish(HttpResponse::refusal()); })) {
         exchange->finish(HttpResponse::failure(http::serviceUnavailable));
     }
 }
@@ -101,16 +149,21 @@ void Dispatcher::stop() {
     workers_.stop();
 }
 
-HttpResponse Dispatcher::carryOut(const SharedExchange& exchange, const Caller& caller) {
+HttpResponse Dispatcher::carryOut(Exchange& exchange, Caller caller) {
     if (!operations_) {
-        return HttpResponse::of(pages_(*exchange->page));
+        return HttpResponse::of(pages_(*exchange.page));
     }
-    const Call call = readCall(exchange->body, settings_.limits.depth);
-    checkAgreement(*exchange->headers, call);
-    Caller asking = caller;
-    asking.gone = [&exchange] { return exchange->isFinished(); };
+    const std::size_t most = usualMemory(exchange.body.size());
+    if (!exchange.memory.growTo(exchange.memory.size() + std::max(most, responseMemory))) {
+        throw HttpFailure(http::serviceUnavailable, "", "no memory for the request");
+    }
+    const Call call = readCall(exchange.body, settings_.limits.depth, most);
+    checkAgreement(*exchange.headers, call);
+    exchange.body = std::string();
+    exchange.memory.shrinkTo(std::max(most, responseMemory));
+    caller.gone = [&exchange] { return exchange.isFinished(); };
     const auto start = Exchange::Clock::now();
-    ResponseBody body = operations_->perform(call, asking);
+    ResponseBody body = operations_->perform(call, caller);
     counts_.operationDone(Operations::nameOf(call), body.status(), Exchange::Clock::now() - start);
     return HttpResponse::of(std::move(body));
 }
@@ -122,7 +175,9 @@ void Dispatcher::work(const SharedExchange& exchange, const Caller& caller) {
         return;
     }
     try {
-        exchange->finish(carryOut(exchange, caller));
+        HttpResponse response = carryOut(*exchange, caller);
+        exchange->memory.shrinkTo(responseMemory);
+        exchange->finish(std::move(response));
     } catch (const HttpFailure& failure) {
         log_(LogKind::request, exchange->address() + ": " + failure.what());
         exchange->finish(HttpResponse::failure(failure));

@@ -1,10 +1,15 @@
 #pragma once
 
+#include <memory>
 #include <optional>
 #include <string>
+#include <utility>
+#include <vector>
 
+#include "http/AddressShares.h"
 #include "http/Authenticator.h"
 #include "http/Exchange.h"
+#include "http/FairQueue.h"
 #include "http/TaskPool.h"
 #include "operations/Operations.h"
 #include "wbem/Metrics.h"
@@ -20,12 +25,19 @@ class Dispatcher {
   public:
     /// Borrows all of them. Null for `manager`: requests are for pages.
     Dispatcher(ObjectManager* manager, const PageHandler& pages, const ServerSettings& settings,
-               const ServerLog& log, ServerCounts& counts);
+               const ServerLog& log, AddressShares& shares, ServerCounts& counts);
 
-    /// Sees to the response to a request that is complete and handed over.
+    /// Whether the head of a request, with users, proves without a long check who sent it.
+    [[nodiscard]] bool isRemembered(Exchange& exchange);
+    /// Finds out who sent a request that is handed over behind its head, which may take long:
+    /// gives it back, or finishes it.
+    void authenticate(const SharedExchange& exchange);
+    /// Sees to the response to a request that is complete and handed over. With users, its user
+    /// is known.
     void dispatch(const SharedExchange& exchange);
-    /// Responds, after a while, that credentials are needed, and logs who had none.
-    void refuse(const SharedExchange& exchange, const std::string& who);
+
+    /// Has other users from now on. Only with users.
+    void renewUsers(std::vector<User> users) { authenticator_->renew(std::move(users)); }
 
     /// Runs a short task once the delay is over.
     void runAfter(TaskPool::Clock::duration delay, TaskPool::Task task);
@@ -36,19 +48,24 @@ class Dispatcher {
     void stop();
 
   private:
-    void admit(const SharedExchange& exchange, const Identity& identity);
-    void checkPassword(const SharedExchange& exchange);
+    /// What one check has of its address, until the client has its response.
+    class Turn;
+    void checkPassword(const SharedExchange& exchange, const std::shared_ptr<Turn>& turn);
+    /// Responds, after a while, that the credentials are wrong, and logs whose.
+    void refuse(const SharedExchange& exchange, const std::shared_ptr<Turn>& turn);
     void runOrRefuse(TaskPool& pool, const SharedExchange& exchange, TaskPool::Task task);
+    [[nodiscard]] HttpResponse carryOut(Exchange& exchange, Caller caller);
     /// Carries a request out, in a worker.
     void work(const SharedExchange& exchange, const Caller& caller);
-    [[nodiscard]] HttpResponse carryOut(const SharedExchange& exchange, const Caller& caller);
 
     const PageHandler& pages_;
     const ServerSettings& settings_;
     const ServerLog& log_;
     ServerCounts& counts_;
+    AddressShares& shares_;
     std::optional<Operations> operations_;
     std::optional<Authenticator> authenticator_;
+    FairQueue checks_;
     // End first, in this order reversed: their tasks use all of the above.
     TaskPool workers_;
     TaskPool gate_;

@@ -20,6 +20,25 @@ bool Exchange::isFinished() const {
     return finished_;
 }
 
+void Exchange::giveBack(Identity identity) {
+    const std::lock_guard lock(mutex_);
+    if (handedOver_ && !finished_) {
+        handedOver_ = false;
+        identity_ = std::move(identity);
+        MHD_resume_connection(connection_);
+    }
+}
+
+std::optional<Identity> Exchange::identity() const {
+    const std::lock_guard lock(mutex_);
+    return identity_;
+}
+
+void Exchange::setIdentity(Identity identity) {
+    const std::lock_guard lock(mutex_);
+    identity_ = std::move(identity);
+}
+
 void Exchange::finish(HttpResponse response) {
     const std::lock_guard lock(mutex_);
     if (handedOver_ && !finished_) {

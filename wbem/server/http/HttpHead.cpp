@@ -44,6 +44,48 @@ void checkSizes(const HttpHead& head, const Limits& limits) {
     }
 }
 
+/// A character of the names of headers (RFC 9110, 5.6.2).
+bool isTokenCharacter(char character) noexcept {
+    constexpr std::string_view marks = "!#$%&'*+-.^_`|~";
+    const char letter = lowered(character);
+    return isDigit(letter) || (letter >= 'a' && letter <= 'z') ||
+           marks.find(letter) != std::string_view::npos;
+}
+
+bool isControl(char character) noexcept {
+    const auto byte = static_cast<unsigned char>(character);
+    return (byte < 0x20 && character != '\t') || byte == 0x7F;
+}
+
+/// A head that a proxy in front of the server could read differently is refused.
+void checkForm(const HttpHead& head) {
+    const bool formed =
+        !head.ambiguous &&
+        std::all_of(head.headers.begin(), head.headers.end(), [](const auto& header) {
+            const auto& [name, value] = header;
+            return !name.empty() && std::all_of(name.begin(), name.end(), isTokenCharacter) &&
+                   std::none_of(value.begin(), value.end(), isControl);
+        });
+    if (!formed) {
+        refuse(http::badRequest, "the head has lines that are not of the form of HTTP");
+    }
+}
+
+/// The path of a target: clients may send the whole URL (RFC 9112, 3.2.2).
+std::string_view pathOf(std::string_view target) noexcept {
+    for (const std::string_view scheme : {"http://", "https://"}) {
+        if (sameName(target.substr(0, scheme.size()), scheme)) {
+            target.remove_prefix(scheme.size());
+            const std::size_t slash = target.find('/');
+            // Without a host it is not a URL.
+            return slash == std::string_view::npos || slash == 0 ? "/" : target.substr(slash);
+        }
+    }
+    return target;
+}
+
+constexpr std::string_view servedPath = "/cimom";
+
 /// How long the body is. A request that says so twice, or in two ways, could mean
 /// different things to a proxy and to this server, and is refused.
 std::optional<std::size_t> readLength(const HttpHead& head, const Limits& limits) {
@@ -187,8 +229,79 @@ std::vector<std::string> HttpHead::values(std::string_view name) const {
     return found;
 }
 
+bool accepts(const std::vector<std::string>& lists, std::string_view word) {
+    std::optional<bool> named;
+    bool others = false;
+    for (const std::string& list : lists) {
+        std::string_view rest = list;
+        while (!rest.empty()) {
+            const std::size_t next = std::min(rest.find(','), rest.size());
+            const std::string_view entry = rest.substr(0, next);
+            rest.remove_prefix(std::min(next + 1, rest.size()));
+            const std::size_t semicolon = std::min(entry.find(';'), entry.size());
+            std::string_view weight = trimmed(entry.substr(semicolon));
+            weight.remove_prefix(std::min<std::size_t>(1, weight.size()));
+            weight = trimmed(weight);
+            // "q=0", "q=0." and "q=0.000", in either case.
+            const bool wanted = !sameName(weight.substr(0, 2), "q=") ||
+                                weight.find_first_not_of("0.", 2) != std::string_view::npos;
+            const std::string_view name = trimmed(entry.substr(0, semicolon));
+            if (sameName(name, word)) {
+                named = wanted;
+            } else if (name == "*") {
+                others = wanted;
+            }
+        }
+    }
+    return named.value_or(others);
+}
+
+std::string PageRequest::header(std::string_view name) const {
+    std::string joined;
+    for (const auto& [each, value] : headers) {
+        if (sameName(each, name)) {
+            joined += (joined.empty() ? "" : ", ") + value;
+        }
+    }
+    return joined;
+}
+
+PageRequest readPageHead(const HttpHead& head, PageArguments arguments, const Limits& limits) {
+    if (head.method != "GET" && head.method != "HEAD") {
+        refuse(http::methodNotAllowed, "only GET and HEAD are served here");
+    }
+    checkForm(head);
+    checkSizes(head, limits);
+    if (head.version == "HTTP/1.1" && !single(head, "Host")) {
+        refuse(http::badRequest, "no Host");
+    }
+    if (single(head, "Content-Length").value_or("0") != "0" || single(head, "Transfer-Encoding")) {
+        refuse(http::badRequest, "a request for a page with a body");
+    }
+    PageRequest request;
+    request.path = head.target;
+    if (!arguments.empty()) {
+        request.path.pop_back();  // the sign in front of the query
+    }
+    request.arguments = std::move(arguments);
+    request.headers = head.headers;
+    request.authorization = single(head, "Authorization");
+    request.arrived = std::chrono::steady_clock::now();
+    return request;
+}
+
+bool asksForCapabilities(const HttpHead& head, const Limits& limits) {
+    if (head.method != "OPTIONS" || (head.target != "*" && pathOf(head.target) != servedPath)) {
+        return false;
+    }
+    checkForm(head);
+    checkSizes(head, limits);
+    return true;
+}
+
 CimHeaders readHead(const HttpHead& head, const Limits& limits) {
-    if (head.target != "/cimom") {
+    checkForm(head);
+    if (pathOf(head.target) != servedPath) {
         refuse(http::notFound, "nothing is at this path");
     }
     if (head.method != "POST" && head.method != "M-POST") {

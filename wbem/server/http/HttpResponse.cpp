@@ -4,6 +4,11 @@
 #include <exception>
 #include <memory>
 #include <utility>
+#include <vector>
+
+#include "cimom/Names.h"
+#include "http/GzipStream.h"
+#include "http/HttpHead.h"
 
 namespace cimom::wbem {
 
@@ -12,23 +17,46 @@ namespace {
 /// How much of a body is written at a time.
 constexpr std::size_t pieceSize = 65536;
 
+/// Shorter bodies are sent as they are: too little would be won.
+constexpr std::size_t leastCompressed = 4096;
+
 /// A body on its way, which libmicrohttpd asks for piece by piece.
 struct Sending {
-    ResponseBody body;
+    std::optional<ResponseBody> body;
+    std::string plain;  ///< the part of the body that comes next
+    std::unique_ptr<GzipStream> gzip;
     std::string piece;
     std::size_t offset = 0;
+    bool ended = false;
+
+    /// Makes the next piece, which may be empty; false when there is none.
+    bool next() {
+        if (ended) {
+            return false;
+        }
+        piece.clear();
+        offset = 0;
+        if (plain.empty() && body) {
+            body->write(plain, pieceSize);
+        }
+        ended = !body || body->ended();
+        if (gzip) {
+            gzip->add(plain, ended, piece);
+        } else {
+            piece.swap(plain);
+        }
+        plain.clear();
+        return true;
+    }
 };
 
 ssize_t nextPiece(void* self, std::uint64_t /*position*/, char* buffer, std::size_t space) {
     auto& sending = *static_cast<Sending*>(self);
     try {
-        if (sending.offset == sending.piece.size()) {
-            if (sending.body.ended()) {
+        while (sending.offset == sending.piece.size()) {
+            if (!sending.next()) {
                 return MHD_CONTENT_READER_END_OF_STREAM;
             }
-            sending.piece.clear();
-            sending.offset = 0;
-            sending.body.write(sending.piece, pieceSize);
         }
     } catch (const std::exception&) {
         // The head is sent: all that can be told is that the body is not whole.
@@ -49,13 +77,45 @@ struct Destroyed {
 };
 using MhdResponse = std::unique_ptr<MHD_Response, Destroyed>;
 
-MhdResponse makeResponse(HttpResponse& response) {
-    if (!response.body || response.body->ended()) {
-        return MhdResponse(MHD_create_response_from_buffer(
-            response.begun.size(), response.begun.data(), MHD_RESPMEM_MUST_COPY));
+/// What the head of a request says about the form of its response.
+struct Form {
+    std::vector<std::string> transfer;
+    std::vector<std::string> content;
+
+    [[nodiscard]] bool chunked() const {
+        return accepts(transfer, "chunked") || accepts(transfer, "trailers");
     }
-    auto sending =
-        std::make_unique<Sending>(Sending{std::move(*response.body), std::move(response.begun), 0});
+    [[nodiscard]] bool compressed() const { return accepts(content, "gzip"); }
+};
+
+MHD_Result addForm(void* self, MHD_ValueKind /*kind*/, const char* name, const char* value) {
+    auto& form = *static_cast<Form*>(self);
+    if (name != nullptr && value != nullptr) {
+        if (sameName(name, "TE")) {
+            form.transfer.emplace_back(value);
+        } else if (sameName(name, "Accept-Encoding")) {
+            form.content.emplace_back(value);
+        }
+    }
+    return MHD_YES;
+}
+
+MhdResponse makeResponse(HttpResponse& response, bool chunked, std::unique_ptr<GzipStream> gzip) {
+    const bool whole = !response.body || response.body->ended();
+    if (whole && !chunked) {
+        std::string content = std::move(response.begun);
+        if (gzip) {
+            std::string compressed;
+            gzip->add(content, true, compressed);
+            content.swap(compressed);
+        }
+        return MhdResponse(
+            MHD_create_response_from_buffer(content.size(), content.data(), MHD_RESPMEM_MUST_COPY));
+    }
+    auto sending = std::make_unique<Sending>();
+    sending->body = std::move(response.body);
+    sending->plain = std::move(response.begun);
+    sending->gzip = std::move(gzip);
     MhdResponse made(MHD_create_response_from_callback(MHD_SIZE_UNKNOWN, pieceSize, nextPiece,
                                                        sending.get(), endSending));
     if (made) {
@@ -92,6 +152,15 @@ HttpResponse HttpResponse::of(Page page) {
     return made;
 }
 
+HttpResponse HttpResponse::capabilities(bool readOnly) {
+    HttpResponse response;
+    response.offered = "basic-read, association-traversal, query-execution, qualifier-declaration";
+    if (!readOnly) {
+        response.offered += ", basic-write, instance-manipulation";
+    }
+    return response;
+}
+
 HttpResponse HttpResponse::of(ResponseBody body) {
     HttpResponse made;
     body.write(made.begun, pieceSize);
@@ -102,7 +171,13 @@ HttpResponse HttpResponse::of(ResponseBody body) {
 MHD_Result sendResponse(MHD_Connection* connection, HttpResponse response, bool manPost,
                         std::chrono::microseconds serverTime) {
     const bool isCim = response.body.has_value();
-    const MhdResponse made = makeResponse(response);
+    const bool close = response.close;
+    Form form;
+    MHD_get_connection_values(connection, MHD_HEADER_KIND, addForm, &form);
+    auto gzip = form.compressed() && response.begun.size() >= leastCompressed ? GzipStream::begin()
+                                                                              : nullptr;
+    const bool compressed = gzip != nullptr;
+    const MhdResponse made = makeResponse(response, form.chunked(), std::move(gzip));
     if (!made) {
         return MHD_NO;
     }
@@ -123,6 +198,19 @@ MHD_Result sendResponse(MHD_Connection* connection, HttpResponse response, bool 
     }
     if (!response.contentType.empty()) {
         add("Content-Type", response.contentType);
+    }
+    if (compressed) {
+        add("Content-Encoding", "gzip");
+    }
+    if (close) {
+        add("Connection", "close");
+    }
+    if (!response.offered.empty()) {
+        add("Allow", "POST, M-POST, OPTIONS");
+        add("Opt", "http://www.dmtf.org/cim/mapping/http/v1.0 ; ns=73");
+        add("73-CIMProtocolVersion", "1.0");
+        add("73-CIMSupportedFunctionalGroups", response.offered);
+        add("73-CIMSupportedQueryLanguages", "WQL, DMTF:CQL");
     }
     if (!response.cimError.empty()) {
         add("CIMError", response.cimError);

@@ -2,6 +2,7 @@
 
 #include <crypt.h>
 #include <fcntl.h>
+#include <sys/file.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -27,8 +28,19 @@ namespace {
     fail(file, std::strerror(errno));
 }
 
+/// Whether a hash is of a kind that takes long to guess: yescrypt and its kin, scrypt, bcrypt,
+/// and the SHA-2 hashes of many rounds; not MD5, SHA-1, NT and DES.
+bool isStrong(std::string_view hash) noexcept {
+    constexpr std::array<std::string_view, 8> kinds{"$y$",  "$gy$", "$7$", "$2a$",
+                                                    "$2b$", "$2y$", "$6$", "$5$"};
+    return std::any_of(kinds.begin(), kinds.end(),
+                       [hash](std::string_view kind) { return hash.starts_with(kind); });
+}
+
+enum class Hashes { strong, any };
+
 /// Reads the users of a text; `file` is for messages.
-std::vector<User> parse(const std::string& text, const std::filesystem::path& file) {
+std::vector<User> parse(const std::string& text, const std::filesystem::path& file, Hashes hashes) {
     std::vector<User> users;
     std::istringstream lines(text);
     std::string line;
@@ -44,8 +56,13 @@ std::vector<User> parse(const std::string& text, const std::filesystem::path& fi
         }
         User user{line.substr(0, first), Role::read, line.substr(second + 1)};
         const auto role = roleFromName(line.substr(first + 1, second - first - 1));
-        if (!isUserName(user.name) || !role || user.hash.size() < 4 || user.hash[0] != '$') {
+        if (!isUserName(user.name) || !role || user.hash.empty()) {
             fail(file, where + "not of the form NAME:ROLE:HASH");
+        }
+        if (hashes == Hashes::strong && !isStrong(user.hash)) {
+            fail(file, where + "the hash of user " + user.name +
+                           " is of a kind that is guessed quickly, or is none; \"cimdhcp user "
+                           "add\" makes a good one");
         }
         user.role = *role;
         if (std::any_of(users.begin(), users.end(),
@@ -121,6 +138,72 @@ class Replacement {
     int fd_;
 };
 
+/// An open users file that is locked for writers. The lock is on the file itself, which
+/// strangers cannot open.
+class LockedFile {
+  public:
+    explicit LockedFile(const std::filesystem::path& file)
+        : fd_(::open(file.c_str(), O_RDONLY | O_CREAT | O_CLOEXEC | O_NOCTTY, S_IRUSR | S_IWUSR)) {
+        bool locked = false;
+        while (fd_ >= 0 && !locked) {
+            locked = ::flock(fd_, LOCK_EX) == 0;
+            if (!locked && errno != EINTR) {
+                break;
+            }
+        }
+        if (!locked) {
+            const int error = errno;
+            close();
+            fail(file, std::strerror(error));
+        }
+    }
+    ~LockedFile() { close(); }
+    LockedFile(const LockedFile&) = delete;
+    LockedFile& operator=(const LockedFile&) = delete;
+
+    /// Whether the name stands for this file, and not for one that has replaced it.
+    [[nodiscard]] bool isStill(const std::filesystem::path& file) const noexcept {
+        struct ::stat own {};
+        struct ::stat named {};
+        return ::fstat(fd_, &own) == 0 && ::stat(file.c_str(), &named) == 0 &&
+               own.st_dev == named.st_dev && own.st_ino == named.st_ino;
+    }
+
+  private:
+    void close() const noexcept {
+        if (fd_ >= 0) {
+            ::close(fd_);
+        }
+    }
+
+    int fd_;
+};
+
+/// Keeps other writers from a users file, which is made if need be, for as long as the result
+/// lives.
+std::unique_ptr<const LockedFile> lockUsers(const std::filesystem::path& file) {
+    auto lock = std::make_unique<const LockedFile>(file);
+    while (!lock->isStill(file)) {
+        // The writer before has put another file into its place.
+        lock = std::make_unique<const LockedFile>(file);
+    }
+    return lock;
+}
+
+/// The file that a name stands for: through symbolic links, so that the file is replaced and
+/// not the link. A link to nothing is refused.
+std::filesystem::path targetOf(const std::filesystem::path& file) {
+    std::error_code error;
+    if (!std::filesystem::is_symlink(std::filesystem::symlink_status(file, error))) {
+        return file;
+    }
+    std::filesystem::path target = std::filesystem::canonical(file, error);
+    if (error) {
+        fail(file, "a symbolic link that leads nowhere: " + error.message());
+    }
+    return target;
+}
+
 /// The memory that crypt(3) needs is too large for a thread's stack. It holds the
 /// password's traces, which are wiped.
 struct Wiped {
@@ -167,21 +250,19 @@ std::vector<User> readUsers(const std::filesystem::path& file) {
     if ((status.st_mode & (S_IWGRP | S_IRWXO)) != 0) {
         fail(file, "may be read or written by others; \"chmod 640\" mends that");
     }
-    std::vector<User> users = parse(contentOf(file), file);
+    std::vector<User> users = parse(contentOf(file), file, Hashes::strong);
     if (users.empty()) {
         fail(file, "names no user; \"cimdhcp user add\" adds one");
     }
     return users;
 }
 
-void putUser(const std::filesystem::path& file, const User& user) {
-    std::error_code error;
-    const bool exists = std::filesystem::exists(file, error);
-    std::vector<User> users;
+void putUser(const std::filesystem::path& name, const User& user) {
+    const std::filesystem::path file = targetOf(name);
+    const auto lock = lockUsers(file);
     std::string text = "# NAME:ROLE:HASH, made by \"cimdhcp user add\"\n";
-    if (exists) {
-        users = parse(contentOf(file), file);
-    }
+    // Hashes of any kind: with this call a weak one gets replaced.
+    std::vector<User> users = parse(contentOf(file), file, Hashes::any);
     const auto known = std::find_if(users.begin(), users.end(),
                                     [&user](const User& other) { return other.name == user.name; });
     if (known == users.end()) {
@@ -194,13 +275,11 @@ void putUser(const std::filesystem::path& file, const User& user) {
     }
     Replacement replacement(file);
     replacement.write(text);
-    if (exists) {
-        const struct ::stat status = statusOf(file);
-        const ::mode_t mode = status.st_mode & (S_IRUSR | S_IWUSR | S_IRGRP);
-        if (::fchown(replacement.fd(), status.st_uid, status.st_gid) != 0 ||
-            ::fchmod(replacement.fd(), mode) != 0) {
-            failErrno(file);
-        }
+    const struct ::stat status = statusOf(file);
+    const ::mode_t mode = status.st_mode & (S_IRUSR | S_IWUSR | S_IRGRP);
+    if (::fchown(replacement.fd(), status.st_uid, status.st_gid) != 0 ||
+        ::fchmod(replacement.fd(), mode) != 0) {
+        failErrno(file);
     }
     replacement.take();
 }

@@ -53,25 +53,48 @@ bool isListed(const std::string& name,
                        [&name](const std::string& listed) { return sameName(listed, name); });
 }
 
+/// The instance as it is, if it can be read.
+std::optional<Instance> readBack(Request& request, const ObjectPath& path) {
+    auto now = request.manager.getInstance(path, {std::nullopt, request.caller.user.value_or("")});
+    return now.status.ok() && now.instances.size() == 1 ? std::move(now.instances.front())
+                                                        : std::nullopt;
+}
+
 std::vector<Modification::Change> changesOf(const Instance& instance, const InstanceRequest& how,
-                                            ObjectManager& manager) {
+                                            Request& request) {
     std::vector<Modification::Change> changes;
-    const auto before = manager.getInstance(instance.path, {std::nullopt, how.principal});
-    const bool readable =
-        before.status.ok() && before.instances.size() == 1 && before.instances.front();
+    const auto before = readBack(request, instance.path);
     for (const NamedValue& property : instance.properties) {
         if (!isListed(property.name, how.propertyList)) {
             continue;
         }
         Modification::Change change{property.name, std::nullopt, property.value};
-        if (readable) {
-            const Value* const old = before.instances.front()->property(property.name);
+        if (before) {
+            const Value* const old = before->property(property.name);
             change.oldValue =
                 old != nullptr ? *old : Value::null(property.value.type, property.value.isArray);
         }
         changes.push_back(std::move(change));
     }
     return changes;
+}
+
+/// What differs from the changes that a provider says it has made. Providers may take a value
+/// and keep another one.
+std::optional<std::string> doubtAbout(const std::vector<Modification::Change>& changes,
+                                      const std::optional<Instance>& now) {
+    if (!now) {
+        return "the instance cannot be read";
+    }
+    for (const Modification::Change& change : changes) {
+        const Value* const value = now->property(change.property);
+        const bool same = value == nullptr ? change.newValue.isNull() : *value == change.newValue;
+        // Clients send back what they have read, which no provider has to keep.
+        if (!same && change.oldValue != change.newValue) {
+            return change.property + " is " + (value == nullptr ? "null" : valueText(*value));
+        }
+    }
+    return std::nullopt;
 }
 
 /// The properties that the client gave, as long as nothing is known of what was before.
@@ -105,8 +128,9 @@ void modify(Request& request, const Instance& instance, const InstanceRequest& h
     checkProperties(instance,
                     requireClass(request, instance.path.className, CimStatus::invalidClass),
                     how.propertyList);
-    modification.changes = changesOf(instance, how, request.manager);
+    modification.changes = changesOf(instance, how, request);
     requireOk(request.manager.modifyInstance(instance, how).status);
+    modification.doubt = doubtAbout(modification.changes, readBack(request, instance.path));
 }
 
 ResponseBody modifyInstance(Request& request) {
@@ -151,6 +175,9 @@ ResponseBody createInstance(Request& request) {
     logged(request, modification, [&] {
         path = create(request, instance);
         modification.object = path;
+        if (!readBack(request, path)) {
+            modification.doubt = "the instance cannot be read";
+        }
     });
     std::string content = "<IRETURNVALUE>";
     writeInstanceName(content, path);
@@ -165,6 +192,9 @@ ResponseBody deleteInstance(Request& request) {
     logged(request, modification, [&] {
         requireOk(
             request.manager.deleteInstance(path, {std::nullopt, request.caller.user.value_or("")}));
+        if (readBack(request, path)) {
+            modification.doubt = "the instance can still be read";
+        }
     });
     return plainResponse(request.call, "");
 }

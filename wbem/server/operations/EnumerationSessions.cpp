@@ -2,6 +2,7 @@
 
 #include <sys/random.h>
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <system_error>
@@ -54,6 +55,19 @@ std::string EnumerationSessions::open(EnumerationSession session) {
         throw CimError(
             CimStatus::serverLimitsExceeded,
             "there are " + std::to_string(entries_.size()) + " open enumerations already");
+    }
+    const auto ofUser =
+        std::count_if(entries_.begin(), entries_.end(), [&session](const auto& entry) {
+            return session.user && entry.second.session.user == session.user;
+        });
+    const auto ofAddress = std::count_if(
+        entries_.begin(), entries_.end(),
+        [&session](const auto& entry) { return entry.second.session.address == session.address; });
+    if (static_cast<std::size_t>(std::max(ofUser, ofAddress)) >= limits_.each) {
+        throw CimError(CimStatus::serverLimitsExceeded,
+                       "there are " + std::to_string(limits_.each) +
+                           " open enumerations of the same " +
+                           (ofUser >= ofAddress ? "user" : "address") + " already");
     }
     std::string context = randomContext();
     const auto end = now + session.timeout;

@@ -25,6 +25,7 @@ struct EnumerationSession {
     std::size_t left = 0;                  ///< objects that are still to come
     std::chrono::seconds timeout{0};       ///< of silence, after which it is forgotten
     std::optional<std::string> user;       ///< who opened it; no other user may go on
+    std::string address;                   ///< from where it was opened
 };
 
 /// The open enumeration sessions of a server, by the contexts that clients hold.
@@ -42,7 +43,8 @@ class EnumerationSessions {
     [[nodiscard]] std::chrono::seconds timeoutFor(std::optional<std::uint32_t> wanted) const;
 
     /// Keeps a session, and gives its context. Throws CimError with
-    /// serverLimitsExceeded when there are too many.
+    /// serverLimitsExceeded when there are too many, of all clients or of the same user or
+    /// address.
     [[nodiscard]] std::string open(EnumerationSession session);
 
     /// Runs `use` on the session of the context, whose silence begins anew; forgets

@@ -15,6 +15,19 @@ std::string textOf(const Scalar& scalar) {
                : scalarText(scalar).value_or("an instance");
 }
 
+const char* verb(Modification::Kind kind) noexcept {
+    switch (kind) {
+        case Modification::Kind::create:
+            return "create";
+        case Modification::Kind::remove:
+            return "delete";
+        default:
+            return "modify";
+    }
+}
+
+}  // namespace
+
 std::string valueText(const Value& value) {
     std::string text;
     if (value.isNull()) {
@@ -34,19 +47,6 @@ std::string valueText(const Value& value) {
     return text;
 }
 
-const char* verb(Modification::Kind kind) noexcept {
-    switch (kind) {
-        case Modification::Kind::create:
-            return "create";
-        case Modification::Kind::remove:
-            return "delete";
-        default:
-            return "modify";
-    }
-}
-
-}  // namespace
-
 std::string modificationText(const Modification& modification) {
     std::string text = verb(modification.kind);
     text += " user=";
@@ -64,7 +64,11 @@ std::string modificationText(const Modification& modification) {
         text += valueText(change.newValue);
     }
     text += " status=";
-    text += modification.status == 0 ? "OK" : cimStatusName(modification.status);
+    if (modification.status != 0) {
+        text += cimStatusName(modification.status);
+    } else {
+        text += modification.doubt ? "ACCEPTED (" + *modification.doubt + ')' : "OK";
+    }
     return modification.description.empty() ? text : text + " (" + modification.description + ')';
 }
 

@@ -104,7 +104,13 @@ ResponseBody portionResponse(Request& request, Portion portion, Form form,
 /// Responds with the first portion, and keeps what is left.
 ResponseBody begin(Request& request, const Opening& opening, Session::Kind kind, Form form,
                    const SpooledResult& result, const std::string& further = "") {
-    Session session{kind, result.spool, 0, result.count, opening.timeout, request.caller.user};
+    Session session{kind,
+                    result.spool,
+                    0,
+                    result.count,
+                    opening.timeout,
+                    request.caller.user,
+                    request.caller.address};
     Portion portion = takePortion(session, opening.portion, "");
     if (session.left > 0) {
         portion.context = request.sessions.open(std::move(session));

@@ -96,6 +96,64 @@ TEST(HttpHead, ServesNothingElse) {
     }
 }
 
+TEST(HttpHead, TakesTheWholeUrlOfWhereItServes) {
+    HttpHead head = good();
+    for (const char* target :
+         {"http://h/cimom", "HTTPS://192.0.2.7:5989/cimom", "http://[2001:db8::1]/cimom"}) {
+        head.target = target;
+        EXPECT_EQ(failureOf(head), "none") << target;
+    }
+    for (const char* target : {"http:///cimom", "http://h", "http://h/", "http://h/cimom/",
+                               "ftp://h/cimom", "//h/cimom", "http:/cimom", "cimom"}) {
+        head.target = target;
+        EXPECT_EQ(failureOf(head), "404") << target;
+    }
+}
+
+TEST(HttpHead, IsRefusedIfOthersCouldReadAnotherRequest) {
+    HttpHead head = good();
+    head.ambiguous = true;
+    EXPECT_EQ(failureOf(head), "400");
+    for (const char* name :
+         {"", "Content-Length ", " X", "X\tY", "X:", "X\x7F", "X(", "\xC3\xA9"}) {
+        EXPECT_EQ(failureWith(name, "10"), "400") << name;
+    }
+    for (const char* value : {"a\rb", "a\x01", "\x7F", "a\nb"}) {
+        EXPECT_EQ(failureWith("X", value), "400") << value;
+    }
+    for (const char* value : {"", "a\tb", "caf\xC3\xA9"}) {
+        EXPECT_EQ(failureWith("X!#$%&'*+-.^_`|~9", value), "none") << value;
+    }
+}
+
+TEST(HttpHead, ListsSayWhatAClientTakes) {
+    EXPECT_TRUE(accepts({"gzip"}, "gzip"));
+    EXPECT_TRUE(accepts({"deflate, GZip;q=0.5"}, "gzip"));
+    EXPECT_TRUE(accepts({"deflate", "br , gzip ; Q=1"}, "gzip"));
+    EXPECT_TRUE(accepts({"*"}, "gzip"));
+    EXPECT_TRUE(accepts({"gzip, *;q=0"}, "gzip"));
+    for (const char* list : {"", "deflate", "gzip;q=0", "gzip; q=0.000", "*, gzip;q=0", "*;q=0",
+                             "xgzip", "gzip2", ",,;"}) {
+        EXPECT_FALSE(accepts({list}, "gzip")) << list;
+    }
+    EXPECT_FALSE(accepts({}, "gzip"));
+}
+
+TEST(HttpHead, OptionsAskWhatIsOffered) {
+    HttpHead head{"OPTIONS", "*", "HTTP/1.1", {{"Host", "h"}}};
+    EXPECT_TRUE(asksForCapabilities(head, {}));
+    head.target = "/cimom";
+    EXPECT_TRUE(asksForCapabilities(head, {}));
+    head.target = "http://h/cimom";
+    EXPECT_TRUE(asksForCapabilities(head, {}));
+    head.target = "/other";
+    EXPECT_FALSE(asksForCapabilities(head, {}));
+    head = {"GET", "*", "HTTP/1.1", {}};
+    EXPECT_FALSE(asksForCapabilities(head, {}));
+    head = {"OPTIONS", "*", "HTTP/1.1", {{"A ", "b"}}};
+    EXPECT_THROW(static_cast<void>(asksForCapabilities(head, {})), HttpFailure);
+}
+
 TEST(HttpHead, WantsTheHeadersOfAnOperation) {
     EXPECT_EQ(failureWithout("Host"), "400");
     EXPECT_EQ(failureWithout("content-type"), "400");
@@ -186,6 +244,83 @@ TEST(HttpHead, AgreesWithTheBody) {
     EXPECT_EQ(disagrees(headers, call), "header-mismatch CIMObject is not what the body says");
     call.method = "Other";
     EXPECT_EQ(disagrees(headers, call), "header-mismatch CIMMethod is not what the body says");
+}
+
+HttpHead pageHead() {
+    return {"GET", "/probe?", "HTTP/1.1", {{"Host", "h"}, {"Accept", "a"}, {"accept", "b"}}};
+}
+
+/// The status of a refused request for a page; 0: it is not refused.
+unsigned pageRefusal(const HttpHead& head, const Limits& limits = {}) {
+    try {
+        static_cast<void>(readPageHead(head, {{"target", "x"}}, limits));
+    } catch (const HttpFailure& failure) {
+        return failure.status;
+    }
+    return 0;
+}
+
+TEST(PageHead, HasPathAndArguments) {
+    HttpHead head = pageHead();
+    set(head, "authorization", " Basic eA== ");
+    const PageRequest request = readPageHead(head, {{"target", "x"}, {"target", ""}}, {});
+    EXPECT_EQ(request.path, "/probe");
+    EXPECT_EQ(request.arguments, (PageArguments{{"target", "x"}, {"target", ""}}));
+    EXPECT_EQ(request.header("ACCEPT"), "a, b");
+    EXPECT_EQ(request.header("None"), "");
+    EXPECT_EQ(request.authorization, "Basic eA==");
+    head.target = "/metrics";
+    head.method = "HEAD";
+    EXPECT_EQ(readPageHead(head, {}, {}).path, "/metrics");
+}
+
+TEST(PageHead, OnlyGetAndHeadAreServed) {
+    for (const char* method :
+         {"POST", "PUT", "DELETE", "OPTIONS", "TRACE", "CONNECT", "M-POST", "get", "X"}) {
+        HttpHead head = pageHead();
+        head.method = method;
+        EXPECT_EQ(pageRefusal(head), 405U) << method;
+    }
+}
+
+TEST(PageHead, NothingIsServedThatCouldBeReadInTwoWays) {
+    EXPECT_EQ(pageRefusal(pageHead()), 0U);
+    const std::pair<const char*, const char*> cases[] = {{"Host", "other"},
+                                                         {"Content-Length", "1"},
+                                                         {"Content-Length", "-0"},
+                                                         {"Content-Length", "x"},
+                                                         {"Transfer-Encoding", "chunked"},
+                                                         {"Transfer-Encoding", "identity"},
+                                                         {"X Y", "z"},
+                                                         {"", "z"},
+                                                         {"X", "a\rb"}};
+    for (const auto& [name, value] : cases) {
+        HttpHead head = pageHead();
+        head.headers.emplace_back(name, value);
+        EXPECT_EQ(pageRefusal(head), 400U) << name << ": " << value;
+    }
+    HttpHead twice = pageHead();
+    twice.headers.emplace_back("Authorization", "a");
+    EXPECT_EQ(pageRefusal(twice), 0U);
+    twice.headers.emplace_back("Authorization", "a");
+    EXPECT_EQ(pageRefusal(twice), 400U);
+    HttpHead nameless = pageHead();
+    std::erase_if(nameless.headers, [](const auto& each) { return each.first == "Host"; });
+    EXPECT_EQ(pageRefusal(nameless), 400U);
+    nameless.version = "HTTP/1.0";
+    EXPECT_EQ(pageRefusal(nameless), 0U);
+    HttpHead ambiguous = pageHead();
+    ambiguous.ambiguous = true;
+    EXPECT_EQ(pageRefusal(ambiguous), 400U);
+}
+
+TEST(PageHead, MayBeAsLongAsAnyOther) {
+    HttpHead head = pageHead();
+    head.headers.emplace_back("X", std::string(8200, 'x'));
+    EXPECT_EQ(pageRefusal(head), 431U);
+    Limits limits;
+    limits.headerLine = 65536;
+    EXPECT_EQ(pageRefusal(head, limits), 0U);
 }
 
 }  // namespace cimom::wbem

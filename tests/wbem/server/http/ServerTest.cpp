@@ -4,9 +4,15 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <zlib.h>
+
+#include <array>
 #include <future>
+#include <memory>
+#include <string>
 #include <thread>
 
+#include "http/GzipStream.h"
 #include "kit/WireSupport.h"
 
 namespace cimom::test {
@@ -178,12 +184,102 @@ TEST_F(WbemServer, RefusesByHttpWhatIsNoCimRequest) {
               "400 request-not-valid");
     EXPECT_EQ(refusal(""), "400 request-not-well-formed");
     EXPECT_EQ(server.ask("GET /cimom HTTP/1.1\r\nHost: h\r\n\r\n").status, 405U);
-    EXPECT_EQ(server.ask("GET /cimom HTTP/1.1\r\nHost: h\r\n\r\n").header("Allow"), "POST, M-POST");
+    EXPECT_EQ(server.ask("GET /cimom HTTP/1.1\r\nHost: h\r\n\r\n").header("Allow"),
+              "POST, M-POST, OPTIONS");
     EXPECT_EQ(server.ask("POST / HTTP/1.1\r\nHost: h\r\nContent-Length: 0\r\n\r\n").status, 404U);
     EXPECT_EQ(server.ask("POST /cimom?x=1 HTTP/1.1\r\nHost: h\r\nContent-Length: 0\r\n\r\n").status,
               404U);
     EXPECT_EQ(server.ask("POST /cimom HTTP/1.1\r\nContent-Length: 0\r\n\r\n").status, 400U);
     expectServed();
+}
+
+TEST_F(WbemServer, RefusesHeadsThatOthersCouldReadDifferently) {
+    const std::string size = std::to_string(body.size());
+    const auto with = [&](const std::string& lines) {
+        return headFor("EnumerateInstanceNames", size, lines) + body;
+    };
+    using std::string_literals::operator""s;
+    for (const std::string& lines :
+         {"Content-Length : 1\r\n"s, "Content-Length\t: 1\r\n"s, ": x\r\n"s, "X: a\n"s,
+          "X: a\rY: b\r\n"s, "X: a\r b\r\n"s, "X: a\0b\r\n"s, "X: a\0\r\nY: b\r\n"s,
+          "X: a\r\n b\r\n"s, "X: a\r\n\tb\r\n"s, "X: \x01\r\n"s}) {
+        RawClient client(server.port());
+        ASSERT_TRUE(client.send(with(lines)));
+        const auto response = client.receive();
+        ASSERT_TRUE(response) << testing::PrintToString(lines);
+        EXPECT_EQ(response->status, 400U) << testing::PrintToString(lines);
+        EXPECT_EQ(response->header("Connection"), "close");
+        EXPECT_TRUE(client.waitForEnd());
+    }
+    // The line of the request, and the end of the head.
+    for (const auto& [right, wrong] : std::vector<std::pair<std::string, std::string>>{
+             {"HTTP/1.1\r\n", "HTTP/1.1\n"}, {"\r\n\r\n", "\r\n\n"}, {"\r\n\r\n", "\n\n"}}) {
+        std::string request = good;
+        request.replace(request.find(right), right.size(), wrong);
+        EXPECT_EQ(server.ask(request).status, 400U) << testing::PrintToString(wrong);
+    }
+    // None of what is allowed is refused, and a good head is known in whatever pieces it comes.
+    EXPECT_EQ(server.ask(with("X:\r\nY: \r\nZ: a  \r\nCookie: a=b; c=d\r\n")).body, expected);
+    const std::string large = with("X: " + std::string(8000, 'x') + "\r\nY: z\r\n");
+    RawClient client(server.port());
+    for (std::size_t at = 0; at < large.size(); at += 1000) {
+        ASSERT_TRUE(client.send(large.substr(at, 1000)));
+    }
+    EXPECT_EQ(client.receive().value_or(HttpResponse()).body, expected);
+    ASSERT_TRUE(client.send(large + large));
+    EXPECT_EQ(client.receive().value_or(HttpResponse()).body, expected);
+    EXPECT_EQ(client.receive().value_or(HttpResponse()).body, expected);
+}
+
+TEST_F(WbemServer, RespondsInChunksToClientsThatAnnounceThem) {
+    for (const char* announced : {"TE: chunked\r\n", "TE: trailers\r\n",
+                                  "te: Trailers, x;q=0.1\r\n", "TE: x\r\nTE: trailers\r\n"}) {
+        RawClient client(server.port());
+        client.send(httpRequest("EnumerateInstanceNames", body, announced));
+        const auto response = client.receive();
+        ASSERT_TRUE(response) << announced;
+        EXPECT_EQ(response->body, expected);
+        EXPECT_EQ(response->header("Transfer-Encoding"), "chunked") << announced;
+        EXPECT_EQ(response->header("Content-Length"), "");
+        // Those of HTTP alone, too, which are empty.
+        client.send(httpRequest("GetClass", "<CIM", announced));
+        const auto refused = client.receive();
+        ASSERT_TRUE(refused) << announced;
+        EXPECT_EQ(refused->status, 400U);
+        EXPECT_EQ(refused->header("Transfer-Encoding"), "chunked");
+        EXPECT_EQ(refused->body, "");
+    }
+    for (const char* silent : {"", "TE: trailers;q=0\r\n", "TE: deflate\r\n"}) {
+        EXPECT_EQ(server.ask(httpRequest("EnumerateInstanceNames", body, silent))
+                      .header("Transfer-Encoding"),
+                  "")
+            << silent;
+    }
+}
+
+TEST_F(WbemServer, TellsWhatItOffers) {
+    for (const char* target : {"*", "/cimom", "http://h/cimom"}) {
+        RawClient client(server.port());
+        client.send("OPTIONS " + std::string(target) + " HTTP/1.1\r\nHost: h\r\n\r\n");
+        const HttpResponse response = client.receiveAny().value_or(HttpResponse());
+        EXPECT_EQ(response.status, 200U);
+        EXPECT_EQ(response.header("Opt"), "http://www.dmtf.org/cim/mapping/http/v1.0 ; ns=73");
+        EXPECT_EQ(response.header("73-CIMProtocolVersion"), "1.0");
+        EXPECT_EQ(response.header("73-CIMSupportedFunctionalGroups"),
+                  "basic-read, association-traversal, query-execution, qualifier-declaration, "
+                  "basic-write, instance-manipulation");
+        EXPECT_EQ(response.header("Allow"), "POST, M-POST, OPTIONS");
+        // The connection goes on.
+        client.send(good);
+        EXPECT_EQ(client.receive().value_or(HttpResponse()).body, expected);
+    }
+    EXPECT_EQ(server.ask("OPTIONS /other HTTP/1.1\r\nHost: h\r\n\r\n").status, 404U);
+}
+
+TEST_F(WbemServer, TakesTheWholeUrl) {
+    std::string whole = good;
+    whole.replace(whole.find("/cimom"), 6, "http://localhost:5988/cimom");
+    EXPECT_EQ(server.ask(whole).body, expected);
 }
 
 TEST_F(WbemServer, ServesClientsOfHttp10) {
@@ -235,6 +331,79 @@ TEST_F(WbemServer, ServesOthersBesideManySlowClients) {
     for (RawClient& client : slow) {
         EXPECT_EQ(client.receive().value_or(HttpResponse()).body, expected);
     }
+}
+
+/// What a gzip stream holds; fails the test for anything else.
+std::string unzipped(const std::string& compressed) {
+    z_stream stream{};
+    constexpr int gzipOnly = 15 + 16;
+    EXPECT_EQ(inflateInit2(&stream, gzipOnly), Z_OK);
+    std::string bytes = compressed;
+    stream.next_in = reinterpret_cast<Bytef*>(bytes.data());
+    stream.avail_in = static_cast<uInt>(bytes.size());
+    std::string text;
+    std::array<char, 65536> piece{};
+    int result = Z_OK;
+    while (result == Z_OK) {
+        stream.next_out = reinterpret_cast<Bytef*>(piece.data());
+        stream.avail_out = piece.size();
+        result = inflate(&stream, Z_NO_FLUSH);
+        text.append(piece.data(), piece.size() - stream.avail_out);
+    }
+    EXPECT_EQ(result, Z_STREAM_END);
+    EXPECT_EQ(stream.avail_in, 0U);
+    inflateEnd(&stream);
+    return text;
+}
+
+TEST(WbemLongResponses, AreCompressedForClientsThatAskForIt) {
+    const auto asked = [](TestServer& server, const std::string& further) {
+        RawClient client(server.port());
+        client.send(httpRequest("EnumerateInstances",
+                                callXml("EnumerateInstances", classParameter("Many_Thing")),
+                                further));
+        return client.receiveAny().value_or(HttpResponse());
+    };
+    for (const unsigned count : {10U, 2000U}) {
+        setManyThings(count);
+        TestServer server({}, manyConfiguration());
+        const HttpResponse plain = asked(server, "");
+        EXPECT_EQ(plain.header("Content-Encoding"), "");
+        const HttpResponse zipped = asked(server, "Accept-Encoding: deflate, gzip\r\n");
+        EXPECT_EQ(zipped.header("Content-Encoding"), "gzip");
+        EXPECT_LT(zipped.body.size(), plain.body.size() / 4);
+        EXPECT_EQ(unzipped(zipped.body), plain.body);
+        const HttpResponse chunks = asked(server, "Accept-Encoding: gzip\r\nTE: trailers\r\n");
+        EXPECT_EQ(chunks.header("Transfer-Encoding"), "chunked");
+        EXPECT_EQ(unzipped(chunks.body), plain.body);
+        for (const char* refused : {"Accept-Encoding: gzip;q=0\r\n", "Accept-Encoding: br\r\n",
+                                    "Accept-Encoding: *, gzip;q=0.0\r\n"}) {
+            EXPECT_EQ(asked(server, refused).header("Content-Encoding"), "") << refused;
+        }
+    }
+    setManyThings(1);
+    TestServer server({}, manyConfiguration());
+    // Too short to gain by it.
+    EXPECT_EQ(asked(server, "Accept-Encoding: gzip\r\n").header("Content-Encoding"), "");
+}
+
+TEST(WbemLongResponses, AreCompressedWhileThereIsRoomForIt) {
+    std::vector<std::unique_ptr<wbem::GzipStream>> streams;
+    for (int count = 0; count < wbem::GzipStream::most; ++count) {
+        streams.push_back(wbem::GzipStream::begin());
+        EXPECT_NE(streams.back(), nullptr);
+    }
+    EXPECT_EQ(wbem::GzipStream::begin(), nullptr);
+    setManyThings(10);
+    TestServer server({}, manyConfiguration());
+    const std::string request = httpRequest(
+        "EnumerateInstances", callXml("EnumerateInstances", classParameter("Many_Thing")),
+        "Accept-Encoding: gzip\r\n");
+    EXPECT_EQ(server.ask(request).header("Content-Encoding"), "");
+    streams.clear();
+    RawClient client(server.port());
+    client.send(request);
+    EXPECT_EQ(client.receiveAny().value_or(HttpResponse()).header("Content-Encoding"), "gzip");
 }
 
 TEST(WbemLongResponses, ComeInChunksAndWhole) {

@@ -1,6 +1,8 @@
 #include <gtest/gtest.h>
 #include <sys/stat.h>
 
+#include <filesystem>
+#include <future>
 #include <stdexcept>
 
 #include "http/Authenticator.h"
@@ -52,7 +54,7 @@ TEST_F(UsersFile, WithAFaultIsRefusedWithItsLine) {
     EXPECT_EQ(failure(), "line 2: not of the form NAME:ROLE:HASH");
     write("ada:admin:$y$a\n");
     EXPECT_EQ(failure(), "line 1: not of the form NAME:ROLE:HASH");
-    write("ada:read:password\n");
+    write("ada:read:\n");
     EXPECT_EQ(failure(), "line 1: not of the form NAME:ROLE:HASH");
     write("a b:read:$y$a\n");
     EXPECT_EQ(failure(), "line 1: not of the form NAME:ROLE:HASH");
@@ -60,6 +62,52 @@ TEST_F(UsersFile, WithAFaultIsRefusedWithItsLine) {
     EXPECT_EQ(failure(), "line 2: user ada is there twice");
     write("# nobody\n");
     EXPECT_EQ(failure(), "names no user; \"cimdhcp user add\" adds one");
+}
+
+TEST_F(UsersFile, WithAHashThatIsGuessedQuicklyIsRefused) {
+    for (const char* weak : {"$1$salt$hash", "ab0dEfGhIjKlM", "$md5$salt$$hash", "$3$$hash",
+                             "$sha1$1$salt$hash", "_J9..rasmBYk8r9AiWNc", "$", "*"}) {
+        write("# x\nada:read:" + std::string(weak) + "\n");
+        EXPECT_EQ(failure(),
+                  "line 2: the hash of user ada is of a kind that is guessed quickly, or is none; "
+                  "\"cimdhcp user add\" makes a good one")
+            << weak;
+    }
+    putUser(file, {"ada", Role::read, "$y$1"});
+    EXPECT_EQ(readUsers(file), (std::vector<User>{{"ada", Role::read, "$y$1"}}));
+    for (const char* strong :
+         {"$y$x", "$gy$x", "$7$x", "$2b$x", "$2a$x", "$2y$x", "$6$x", "$5$x"}) {
+        write("ada:read:" + std::string(strong) + "\n");
+        EXPECT_EQ(failure(), "none") << strong;
+    }
+}
+
+TEST_F(UsersFile, TakesSeveralWritersAtOnce) {
+    constexpr int writers = 16;
+    std::vector<std::future<void>> writing;
+    for (int index = 0; index < writers; ++index) {
+        writing.push_back(std::async(std::launch::async, [this, index] {
+            putUser(file, {"u" + std::to_string(index), Role::read, "$y$1"});
+        }));
+    }
+    for (auto& each : writing) {
+        each.get();
+    }
+    EXPECT_EQ(readUsers(file).size(), static_cast<std::size_t>(writers));
+}
+
+TEST_F(UsersFile, BehindASymbolicLinkIsReplacedThere) {
+    write("ada:read:$y$1\n", 0640);
+    const std::string link = directory / "link";
+    std::filesystem::create_symlink("users", link);
+    putUser(link, {"bob", Role::read, "$y$2"});
+    EXPECT_EQ(std::filesystem::read_symlink(link), "users");
+    EXPECT_EQ(mode(), 0640U);
+    EXPECT_EQ(readUsers(file).size(), 2U);
+    const std::string lost = directory / "lost";
+    std::filesystem::create_symlink("nothing", lost);
+    EXPECT_THROW(putUser(lost, {"bob", Role::read, "$y$2"}), UsersError);
+    EXPECT_FALSE(std::filesystem::exists(directory / "nothing"));
 }
 
 TEST_F(UsersFile, ThatOthersCanReachIsRefused) {
@@ -156,6 +204,14 @@ TEST_F(AuthenticatorTest, RemembersForAMinuteWhatWasRight) {
     EXPECT_EQ(authenticator.remembered(wrong), std::nullopt);
     now += std::chrono::seconds(60);
     EXPECT_EQ(authenticator.remembered(good), std::nullopt);
+}
+
+TEST_F(AuthenticatorTest, KnowsItsUsersAnew) {
+    EXPECT_TRUE(authenticator.check(good));
+    authenticator.renew({{"bob", Role::modify, hashPassword("pass:word")}});
+    EXPECT_EQ(authenticator.remembered(good), std::nullopt);
+    EXPECT_EQ(authenticator.check(good), std::nullopt);
+    EXPECT_EQ(authenticator.check(withColon), (Identity{"bob", Role::modify}));
 }
 
 TEST_F(AuthenticatorTest, TellsNoSecretToTheLog) {

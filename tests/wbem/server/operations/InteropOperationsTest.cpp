@@ -219,24 +219,53 @@ TEST_F(WbemChanges, InstancesAreCreatedAndLogged) {
     const auto made = returned(server.call(
         "CreateInstance", newInstance("Test_Left", property("Id", "l3") + property("Note", "n"))));
     ASSERT_THAT(made, SizeIs(1));
+    returned(server.call("CreateInstance", newInstance("Test_Left", property("Id", "l1"))));
     EXPECT_EQ(made.front().name, "INSTANCENAME");
     EXPECT_EQ(toText(wbem::readPath(made.front())), "Test_Left.Id=\"l3\"");
     EXPECT_THAT(
         server.log(wbem::LogKind::modification),
-        ElementsAre(HasSubstr(
-            R"(create user=none address=127.0.0.1 object=root/test:Test_Left.Id="l3" Id: "l3" Note: "n" status=OK)")));
+        ElementsAre(
+            // The provider says that it has made it, and has not.
+            R"(create user=none address=127.0.0.1 object=root/test:Test_Left.Id="l3" Id: "l3" Note: "n" status=ACCEPTED (the instance cannot be read))",
+            R"(create user=none address=127.0.0.1 object=root/test:Test_Left.Id="l1" Id: "l1" status=OK)"));
+}
+
+TEST_F(WbemChanges, TheLogTellsWhetherAValueWasKept) {
+    const auto modify = [this](const std::string& className, const std::string& properties) {
+        server.call(
+            "ModifyInstance",
+            parameter("ModifiedInstance", "<VALUE.NAMEDINSTANCE>" + instanceName(className, "l1") +
+                                              "<INSTANCE CLASSNAME=\"" + className + "\">" +
+                                              properties + "</INSTANCE></VALUE.NAMEDINSTANCE>"));
+    };
+    const auto note = [](const std::string& value) {
+        return "<PROPERTY NAME=\"Note\" TYPE=\"string\"><VALUE>" + value + "</VALUE></PROPERTY>";
+    };
+    modify("Test_Left", note("kept"));
+    // The provider keeps what is in Note, and nothing else.
+    modify("Test_Left", note("kept") +
+                            "<PROPERTY NAME=\"Id\" TYPE=\"string\"><VALUE>l7</VALUE>"
+                            "</PROPERTY>");
+    const auto lines = server.log(wbem::LogKind::modification);
+    ASSERT_THAT(lines, SizeIs(2));
+    EXPECT_THAT(lines[0], testing::EndsWith("-> \"kept\" status=OK"));
+    EXPECT_THAT(lines[1], testing::EndsWith("Id: \"l1\" -> \"l7\" status=ACCEPTED (Id is \"l1\")"));
 }
 
 TEST_F(WbemChanges, InstancesAreDeletedAndLogged) {
     const wbem::XmlElement done =
         server.call("DeleteInstance", parameter("InstanceName", instanceName("Test_Left", "l1")));
     EXPECT_THAT(done.children, SizeIs(0));
+    server.call("DeleteInstance", parameter("InstanceName", instanceName("Test_Left", "gone")));
     EXPECT_EQ(errorOf(server.call("DeleteInstance",
                                   parameter("InstanceName", instanceName("Test_Left", "none")))),
               "6 CIM_ERR_NOT_FOUND");
-    EXPECT_THAT(server.log(wbem::LogKind::modification),
-                ElementsAre(HasSubstr(R"(object=root/test:Test_Left.Id="l1" status=OK)"),
-                            HasSubstr("status=CIM_ERR_NOT_FOUND")));
+    EXPECT_THAT(
+        server.log(wbem::LogKind::modification),
+        ElementsAre(HasSubstr(R"(Test_Left.Id="l1" status=ACCEPTED (the instance can still )"
+                              "be read)"),
+                    HasSubstr(R"(object=root/test:Test_Left.Id="gone" status=OK)"),
+                    HasSubstr("status=CIM_ERR_NOT_FOUND")));
 }
 
 TEST_F(WbemChanges, WhateverIsWrongWithANewInstanceHasOneStatus) {

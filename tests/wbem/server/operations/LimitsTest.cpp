@@ -39,14 +39,22 @@ TEST(Limits, CannotBeSwitchedOffByZero) {
     EXPECT_EQ(number(&Limits::result), "max-result is 0; it may be 1024 to 1099511627776");
     EXPECT_EQ(number(&Limits::ioThreads), "io-threads is 0; it may be 1 to 64");
     EXPECT_EQ(number(&Limits::waiting), "max-waiting is 0; it may be 1 to 65536");
+    EXPECT_EQ(number(&Limits::connectionsEach), "max-connections-each is 0; it may be 1 to 65536");
+    EXPECT_EQ(number(&Limits::connectionRate), "max-connection-rate is 0; it may be 1 to 65536");
+    EXPECT_EQ(number(&Limits::checksEach), "max-checks-each is 0; it may be 1 to 65536");
+    EXPECT_EQ(number(&Limits::refusalsEach), "max-refusals-each is 0; it may be 1 to 65536");
+    EXPECT_EQ(number(&Limits::memory), "max-memory is 0; it may be 1048576 to 1099511627776");
     const auto seconds = [](std::chrono::seconds Limits::*limit, int value) {
         return failure([=](Limits& limits) { limits.*limit = std::chrono::seconds(value); });
     };
+    EXPECT_EQ(seconds(&Limits::head, 0), "head-timeout is 0; it may be 1 to 86400");
     EXPECT_EQ(seconds(&Limits::request, 0), "request-timeout is 0; it may be 1 to 86400");
     EXPECT_EQ(seconds(&Limits::response, 0), "answer-timeout is 0; it may be 1 to 86400");
     EXPECT_NE(seconds(&Limits::response, -1), "none");
     EXPECT_EQ(failure([](Limits& limits) { limits.sessions.sessions = 0; }),
               "max-enumerations is 0; it may be 1 to 65536");
+    EXPECT_EQ(failure([](Limits& limits) { limits.sessions.each = 0; }),
+              "max-enumerations-each is 0; it may be 1 to 65536");
     EXPECT_EQ(
         failure([](Limits& limits) { limits.sessions.defaultTimeout = std::chrono::seconds(0); }),
         "enumeration-timeout is 0; it may be 1 to 86400");
@@ -61,6 +69,10 @@ TEST(Limits, HaveAnUpperEnd) {
               "max-depth is 257; it may be 8 to 256");
     EXPECT_EQ(failure([](Limits& limits) { limits.connections = 1; }),
               "max-connections is below io-threads");
+    // The largest request has to fit into the memory of its address.
+    EXPECT_EQ(failure([](Limits& limits) { limits.memory = 42991616; }), "none");
+    EXPECT_EQ(failure([](Limits& limits) { limits.memory = 42991615; }),
+              "max-memory is below 42991616, 40 times max-body");
 }
 
 std::string settingsFailure(const ServerSettings& settings) {
@@ -138,6 +150,13 @@ TEST(Modification, TellsWhyItWasNotDone) {
     EXPECT_EQ(modificationText(made),
               R"(modify user=none address=192.0.2.7 object=root/x:A.k="v" )"
               "status=CIM_ERR_ACCESS_DENIED (this needs the right to modify)");
+}
+
+TEST(Modification, TellsThatItIsNotCertain) {
+    Modification made = modification();
+    made.doubt = "Name is null";
+    EXPECT_EQ(modificationText(made), R"(modify user=none address=192.0.2.7 object=root/x:A.k="v" )"
+                                      "status=ACCEPTED (Name is null)");
 }
 
 TEST(Modification, ShortensLongValues) {

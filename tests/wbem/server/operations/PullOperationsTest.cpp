@@ -240,6 +240,44 @@ TEST_F(EnumerationSessionsTest, EndsWithItsLastObject) {
     EXPECT_FALSE(has(context));
 }
 
+TEST_F(EnumerationSessionsTest, AUserHasAShareAndAnAddressHasOne) {
+    const auto open = [this](const char* user, const char* address) {
+        EnumerationSession made = session(user == nullptr ? std::nullopt : std::optional(user));
+        made.address = address;
+        try {
+            static_cast<void>(sessions.open(std::move(made)));
+            return std::string();
+        } catch (const CimError& error) {
+            return std::to_string(error.code) + ' ' + error.what();
+        }
+    };
+    const SessionLimits limits;
+    for (std::size_t count = 0; count < limits.each; ++count) {
+        ASSERT_EQ(open("ada", ("192.0.2." + std::to_string(count)).c_str()), "");
+        ASSERT_EQ(open(nullptr, "::1"), "");
+    }
+    EXPECT_EQ(open("ada", "192.0.2.99"),
+              "27 there are 32 open enumerations of the same user already");
+    EXPECT_EQ(open(nullptr, "::1"),
+              "27 there are 32 open enumerations of the same address already");
+    EXPECT_EQ(open("bob", "::1"), "27 there are 32 open enumerations of the same address already");
+    EXPECT_EQ(open("bob", "192.0.2.99"), "");
+    EXPECT_EQ(open(nullptr, "192.0.2.99"), "");
+    // What is over does not count any more.
+    now += std::chrono::seconds(60);
+    EXPECT_EQ(open("ada", "::1"), "");
+}
+
+TEST_F(EnumerationSessionsTest, ThereAreSoManyOfAll) {
+    const SessionLimits limits;
+    for (std::size_t count = 0; count < limits.sessions; ++count) {
+        EnumerationSession made = session("user" + std::to_string(count));
+        made.address = std::to_string(count);
+        ASSERT_NO_THROW(static_cast<void>(sessions.open(std::move(made))));
+    }
+    EXPECT_THROW(static_cast<void>(sessions.open(session("ada"))), CimError);
+}
+
 TEST_F(EnumerationSessionsTest, HasNoEndlessTimeouts) {
     EXPECT_EQ(sessions.timeoutFor(std::nullopt), std::chrono::seconds(60));
     EXPECT_EQ(sessions.timeoutFor(1), std::chrono::seconds(1));

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstddef>
+#include <limits>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -32,8 +33,9 @@ struct Call {
 
 /// Reads the body of a request: one CIM element with a simple request (DSP0201,
 /// 5.6). Throws HttpFailure with the response that DSP0200, 7.3.4 has for
-/// anything else.
-[[nodiscard]] Call readCall(std::string_view body, std::size_t maximumDepth);
+/// anything else, and for elements that would take more than some `maximumMemory` bytes.
+[[nodiscard]] Call readCall(std::string_view body, std::size_t maximumDepth,
+                            std::size_t maximumMemory = std::numeric_limits<std::size_t>::max());
 
 /// What stands before and behind the result of a successful call.
 [[nodiscard]] std::string responseHead(const Call& call);

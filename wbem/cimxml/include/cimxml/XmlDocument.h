@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstddef>
+#include <limits>
 #include <stdexcept>
 #include <string>
 #include <string_view>
@@ -29,9 +30,20 @@ class XmlError : public std::runtime_error {
     using std::runtime_error::runtime_error;
 };
 
+/// Memory that a document of such a length may well take: its elements are as long as those of
+/// CIM-XML, on the whole. A short element takes many times its length.
+[[nodiscard]] constexpr std::size_t usualMemory(std::size_t length) noexcept {
+    constexpr std::size_t least = 65536;
+    constexpr std::size_t times = 16;
+    return least + times * length;
+}
+
 /// Reads a whole XML 1.0 document in UTF-8, whatever encoding it names. Throws
 /// XmlError when it is not well-formed, has a document type declaration (and so
-/// might define entities), or nests its elements deeper than `maximumDepth`.
-[[nodiscard]] XmlElement readXml(std::string_view text, std::size_t maximumDepth);
+/// might define entities), nests its elements deeper than `maximumDepth`, or whose
+/// elements would take more than some `maximumMemory` bytes.
+[[nodiscard]] XmlElement readXml(
+    std::string_view text, std::size_t maximumDepth,
+    std::size_t maximumMemory = std::numeric_limits<std::size_t>::max());
 
 }  // namespace cimom::wbem

@@ -2,6 +2,7 @@
 
 #include <chrono>
 #include <functional>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <utility>
@@ -9,12 +10,15 @@
 
 namespace cimom::wbem {
 
+/// Of a query, decoded, in their order.
+using PageArguments = std::vector<std::pair<std::string, std::string>>;
+
 /// A page that a client asks for with GET or HEAD.
 struct PageRequest {
     std::string path;
-    /// Of the query, decoded, in their order.
-    std::vector<std::pair<std::string, std::string>> arguments;
+    PageArguments arguments;
     std::vector<std::pair<std::string, std::string>> headers;
+    std::optional<std::string> authorization;  ///< the header of that name
     std::chrono::steady_clock::time_point arrived{};
 
     /// The values of all headers of that name, with commas between them; empty: there is none.

@@ -3,6 +3,7 @@
 #include <cstdint>
 #include <memory>
 #include <string>
+#include <vector>
 
 #include "cimom/Forward.h"
 #include "wbem/Metrics.h"
@@ -27,6 +28,13 @@ class Server {
     ~Server();
     Server(const Server&) = delete;
     Server& operator=(const Server&) = delete;
+
+    /// New connections get this certificate and key from now on; those that are open go on.
+    /// Throws ServerError, and keeps what it had. Safe on any thread, as is renewUsers().
+    void renewTls(const ServerSettings::Tls& tls);
+    /// These are the users from now on; what has been admitted is carried out. Throws
+    /// ServerError for a server that has none.
+    void renewUsers(std::vector<User> users);
 
     [[nodiscard]] std::uint16_t port() const noexcept;
     /// "http://127.0.0.1:5988/cimom"; of a server of pages "http://127.0.0.1:5988/".

@@ -33,12 +33,13 @@ class UsersError : public std::runtime_error {
 
 /// Reads lines NAME:ROLE:HASH, "#" comments. Throws UsersError, also for a file
 /// that others than its owner and group can read or that others than its owner can
-/// write, and for one without users.
+/// write, for one without users, and for hashes that are guessed quickly.
 [[nodiscard]] std::vector<User> readUsers(const std::filesystem::path& file);
 
 /// Adds a user to the file, which is made if need be, or changes role and
 /// password. The file is replaced at once, so that it is never seen half written;
-/// owner and group stay. Throws UsersError.
+/// owner, group and mode stay, and a symbolic link to it does. Several writers at once wait
+/// for each other. Throws UsersError.
 void putUser(const std::filesystem::path& file, const User& user);
 
 /// The yescrypt hash of a password, with a new salt. Takes some 10 milliseconds,

@@ -21,6 +21,7 @@ class ListeningSocket {
     /// SocketError with address, port and reason.
     ListeningSocket(const std::string& address, std::uint16_t port);
     ~ListeningSocket() { close(); }
+    ListeningSocket(ListeningSocket&& other) noexcept : fd_(other.release()) {}
     ListeningSocket(const ListeningSocket&) = delete;
     ListeningSocket& operator=(const ListeningSocket&) = delete;
 
