@@ -183,7 +183,7 @@ void renewed(const std::string& what, Action&& action) {
 /// nothing else from it.
 void renew(const ServeCommand& command, cimom::wbem::Server& server, CurrentUsers* users) {
     // First, since the rest is told there.
-    renewed("where lines are logged", [] {
+    renewed("what is logged, and where", [] {
         const auto settings = ZR::PlatformSettings::read(
             [](const char* name) -> const char* { return std::getenv(name); });
         TKLog::TKLogger::configure({settings.logLevel, settings.logSink},
