@@ -36,7 +36,7 @@ void addLimits(CLI::App& app, cimom::wbem::Limits& limits) {
     number("--max-depth", limits.depth, "Depth of a request's XML (64)");
     number("--max-connections", limits.connections, "Open connections (512)");
     number("--max-connections-each", limits.connectionsEach,
-           "Of these, of an address that has not shown a right password (32)");
+           "Of these, of an address that has not shown a right password (128)");
     number("--max-connection-rate", limits.connectionRate,
            "New connections of such an address in a second (100)");
     number("--max-checks-each", limits.checksEach,

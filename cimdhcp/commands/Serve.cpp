@@ -208,7 +208,7 @@ class EndInTime {
 
 /// Where lines are logged may have changed.
 void renewLogging() {
-    renewed("where lines are logged", [] {
+    renewed("what is logged, and where", [] {
         const auto settings = ZR::PlatformSettings::read(
             [](const char* name) -> const char* { return std::getenv(name); });
         TKLog::TKLogger::configure({settings.logLevel, settings.logSink},

@@ -139,7 +139,10 @@ TEST_F(ServeMemory, IsLittleWithAThousandInterfacesAndManyClients) {
                       test::dhcpInterface("if" + std::to_string(number), "192.0.2.1");
     }
     setTree(test::computer("Computer", interfaces));
-    serve({}, {}, {"--request-timeout", "600"});
+    // All of them have one address, which no request has made known.
+    serve({}, {},
+          {"--request-timeout", "600", "--head-timeout", "600", "--max-connections-each", "512",
+           "--max-connection-rate", "1000"});
     std::vector<ZR::UniqueFd> slow;
     for (int count = 0; count < 200; ++count) {
         slow.push_back(connected("POST /cimom HTTP/1.1\r\nHost: slow\r\nContent-Length: 500\r\n"));

@@ -299,10 +299,12 @@ TEST_F(Serve, ReadsCertificateKeyAndUsersAnew) {
     EXPECT_EQ(status("ada:new"), "400");
     EXPECT_EQ(status("ada:pass-ada"), "401");
 
-    // Where it logs is read anew, too: after a file was moved away, a new one is begun.
-    std::filesystem::rename(directory() / "log", directory() / "log.1");
-    ZR::Testing::writeFile(directory() / "log", "");
-    EXPECT_THAT(reload(), HasSubstr("read anew: where lines are logged"));
+    // And what is logged: by default no line about a refused request is.
+    EXPECT_THAT(log(), testing::Not(HasSubstr("127.0.0.1: ")));
+    ZR::Testing::writeFile(directory() / "platform.conf", "LOG_LEVEL=4000\n");
+    EXPECT_THAT(reload(), HasSubstr("read anew: what is logged, and where"));
+    EXPECT_EQ(status("ada:new"), "400");
+    EXPECT_THAT(log(), HasSubstr("127.0.0.1: "));
     EXPECT_EQ(server_->end(), 0);
 }
 

@@ -14,8 +14,8 @@ namespace {
 // The fastest level takes what counts, since objects of one class resemble each other. The
 // window reaches over several of them.
 constexpr int compressionLevel = 1;
-constexpr int gzipWindow = 13 + 16;  // 16: with gzip's head and end around it
-constexpr int compressionMemory = 7;
+constexpr int gzipWindow = 12 + 16;  // 16: with gzip's head and end around it
+constexpr int compressionMemory = 6;
 
 /// One of the streams that there may be.
 class StreamSlot {

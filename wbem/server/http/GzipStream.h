@@ -8,7 +8,7 @@ namespace cimom::wbem {
 
 /// Compresses one text piece by piece (RFC 1952). Used by one thread at a time.
 ///
-/// One stream takes some 100 KiB; there is a fixed number of them in the process at a time.
+/// One stream takes some 50 KiB; there is a fixed number of them in the process at a time.
 class GzipStream {
     struct State;
 

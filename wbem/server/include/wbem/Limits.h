@@ -23,7 +23,7 @@ struct Limits {
     std::size_t body = 1U << 20U;        ///< bytes of a request's body
     std::size_t depth = 64;              ///< of XML elements
     std::size_t connections = 512;       ///< at the same time
-    std::size_t connectionsEach = 32;    ///< of these, of an address that is not known
+    std::size_t connectionsEach = 128;   ///< of these, of an address that is not known
     std::size_t connectionRate = 100;    ///< new ones of such an address in a second
     std::size_t checksEach = 8;          ///< passwords of an address that are checked or refused
     std::size_t refusalsEach = 60;       ///< wrong passwords of an address in a minute
