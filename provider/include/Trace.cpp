@@ -138,11 +138,17 @@ std::size_t formatCut(Buffer& buffer, const Format& format,
     return size;
 }
 
-/// Formats into the buffer, up to its last byte, which stays zero. Never inlined:
-/// in a shared library the address of a thread's buffer takes a call, and the
+/// Formats into the buffer, up to its last byte, which stays zero. Neither inlined nor
+/// cloned: in a shared library the address of a thread's buffer takes a call, and the
 /// compiler would make that call for every piece.
 template <const Format& format, std::same_as<Argument>... Arguments>
-[[gnu::noinline]] std::string_view formatAll(Buffer& buffer, const Arguments&... arguments) {
+#ifdef __clang__
+[[gnu::noinline]]
+#else
+[[gnu::noipa]]
+#endif
+std::string_view
+formatAll(Buffer& buffer, const Arguments&... arguments) {
     static_assert(sizeof...(arguments) == format.arguments);
     const std::size_t size = format.literalSize + (arguments.text.size() + ...);
     if (size >= buffer.text.size()) {
