@@ -5,6 +5,7 @@
 #include <memory>
 #include <optional>
 #include <string_view>
+#include <unordered_map>
 #include <utility>
 
 #include "cimom/Instance.h"
@@ -57,16 +58,51 @@ bool agrees(const cimom::ObjectPath& element, const cimom::ObjectPath& reference
                        });
 }
 
-std::size_t nodeOf(const cimom::ObjectPath& reference, std::vector<GraphNode>& nodes) {
-    const auto found = std::find_if(nodes.begin(), nodes.end(), [&reference](const auto& node) {
-        return agrees(node.path, reference);
-    });
-    if (found == nodes.end()) {
-        nodes.push_back({reference, false});
-        return nodes.size() - 1;
+/// The keys by which one instance differs from the others of its class.
+constexpr std::array<std::string_view, 2> identifying{"InstanceID", "Name"};
+
+/// Nodes under construction, found by what references say of them. A walk over all of them for
+/// each reference would take half a minute on a machine of ten thousand interfaces.
+class Nodes {
+  public:
+    void add(const cimom::ObjectPath& path, bool served) {
+        for (const std::string_view name : identifying) {
+            if (std::string text = heldText(path.key(name)); !text.empty()) {
+                byText_[std::move(text)].push_back(nodes_.size());
+            }
+        }
+        nodes_.push_back({path, served});
     }
-    return static_cast<std::size_t>(found - nodes.begin());
-}
+
+    /// The first one that agrees; a new one, where there is none.
+    std::size_t find(const cimom::ObjectPath& reference) {
+        const auto means = [&](std::size_t node) { return agrees(nodes_[node].path, reference); };
+        for (const std::string_view name : identifying) {
+            if (const std::string text = heldText(reference.key(name)); !text.empty()) {
+                const std::vector<std::size_t>& alike = byText_[text];
+                const auto found = std::find_if(alike.begin(), alike.end(), means);
+                return found == alike.end() ? addMissing(reference) : *found;
+            }
+        }
+        std::size_t node = 0;
+        while (node < nodes_.size() && !means(node)) {
+            ++node;
+        }
+        return node == nodes_.size() ? addMissing(reference) : node;
+    }
+
+    std::vector<GraphNode> take() { return std::move(nodes_); }
+
+  private:
+    std::size_t addMissing(const cimom::ObjectPath& reference) {
+        add(reference, false);
+        return nodes_.size() - 1;
+    }
+
+    std::vector<GraphNode> nodes_;
+    /// In their order, those of which an identifying key has a text.
+    std::unordered_map<std::string, std::vector<std::size_t>> byText_;
+};
 
 bool isTail(const cimom::NamedValue& key) {
     return std::any_of(tails.begin(), tails.end(),
@@ -99,7 +135,7 @@ std::string escaped(std::string_view text) {
 
 /// The key that distinguishes the instance from the others of its class.
 std::string identity(const cimom::ObjectPath& path) {
-    for (const std::string_view name : {"InstanceID", "Name"}) {
+    for (const std::string_view name : identifying) {
         if (std::string text = heldText(path.key(name)); !text.empty()) {
             return text;
         }
@@ -125,8 +161,9 @@ std::string_view fillOf(const std::string& className) {
 Graph connect(const std::vector<cimom::ObjectPath>& elements,
               const std::vector<cimom::ObjectPath>& associations) {
     Graph graph;
+    Nodes nodes;
     for (const cimom::ObjectPath& element : elements) {
-        graph.nodes.push_back({element, true});
+        nodes.add(element, true);
     }
     for (const cimom::ObjectPath& association : associations) {
         const cimom::ObjectPath* from = nullptr;
@@ -135,10 +172,11 @@ Graph connect(const std::vector<cimom::ObjectPath>& elements,
             (isTail(key) ? from : to) = referenceIn(key);
         }
         if (from != nullptr && to != nullptr) {
-            const std::size_t tail = nodeOf(*from, graph.nodes);
-            graph.edges.push_back({association.className, tail, nodeOf(*to, graph.nodes)});
+            const std::size_t tail = nodes.find(*from);
+            graph.edges.push_back({association.className, tail, nodes.find(*to)});
         }
     }
+    graph.nodes = nodes.take();
     return graph;
 }
 

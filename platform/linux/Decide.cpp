@@ -1,6 +1,9 @@
 #include "Decide.h"
 
 #include <algorithm>
+#include <cstddef>
+#include <optional>
+#include <span>
 #include <utility>
 
 #include "InterfaceDiagnostics.h"
@@ -83,8 +86,66 @@ std::shared_ptr<const Snapshot> decide(MachineFacts facts, std::int64_t now, Exp
     return decide(Machine{std::move(facts), now}, explain);
 }
 
-std::shared_ptr<const Snapshot> decide(const Machine& machine, Explain explain) {
+namespace {
+
+/// Finds interfaces that are as they were at another time. They are to be asked for in the
+/// order of their indexes.
+class Unchanged {
+  public:
+    explicit Unchanged(const Decided& before)
+        : tree_(*before.tree),
+          node_(before.tree->first(NodeLexicon::NodeType::NetworkInterface)),
+          view_(before.machine->interfaces().begin()),
+          end_(before.machine->interfaces().end()) {}
+
+    /// The node of the interface then; none when it is to be decided anew.
+    Snapshot::Index find(const InterfaceView& view) {
+        // The nodes come in the order of the views.
+        for (; view_ != end_ && view_->link->ifindex < view.link->ifindex; ++view_) {
+            node_ = tree_.node(node_).nextOfType;
+        }
+        const bool same = view_ != end_ && *view_->link == *view.link &&
+                          view_->hidden == view.hidden && view_->isPlain() && view.isPlain() &&
+                          std::ranges::equal(view_->addresses, view.addresses);
+        return same ? node_ : Snapshot::none;
+    }
+
+  private:
+    const Snapshot& tree_;
+    Snapshot::Index node_;
+    std::span<const InterfaceView>::iterator view_;
+    std::span<const InterfaceView>::iterator end_;
+};
+
+void addInterface(const Machine& machine, const InterfaceView& view, Snapshot::Index network,
+                  Explain explain, std::vector<Diagnostic>& diagnostics, SnapshotBuilder& builder) {
+    const auto interface =
+        builder.add(network, "NetworkInterface", std::string{describe(*view.link)});
+    const std::vector<Decision> decisions = decide(view);
+    for (const Decision& decision : decisions) {
+        // A link can be renamed, but not by a client of this tree: the kernel forgets
+        // the new name at the next start, and leases and settings are found by name.
+        const bool readOnly = decision.property == Properties::Name;
+        if (explain == Explain::Yes) {
+            builder.origin(describe(decision.origin) + ": " + std::string{decision.reason});
+        }
+        builder.property(decision.property, decision.value, readOnly);
+    }
+    addLeases({.machine = machine, .view = view, .decisions = decisions, .node = interface},
+              explain, builder);
+    addDiagnostics(machine, view, decisions, diagnostics);
+}
+
+std::shared_ptr<const Snapshot> treeOf(const Machine& machine, Explain explain,
+                                       const Decided* before) {
     SnapshotBuilder builder;
+    std::optional<Unchanged> unchanged;
+    if (before != nullptr && before->tree) {
+        unchanged.emplace(*before);
+        // As many as then, and those of some new ones.
+        constexpr std::size_t more = 64;
+        builder.reserve(before->tree->nodes().size() + more, before->tree->propertyCount() + more);
+    }
     if (explain == Explain::Yes) {
         builder.origin("kernel: the name of the system");
     }
@@ -97,21 +158,12 @@ std::shared_ptr<const Snapshot> decide(const Machine& machine, Explain explain) 
     const auto network = builder.add(computer, "Network", "Network");
     std::vector<Diagnostic> diagnostics = machine.diagnostics();
     for (const InterfaceView& view : machine.interfaces()) {
-        const auto interface =
-            builder.add(network, "NetworkInterface", std::string{describe(*view.link)});
-        const std::vector<Decision> decisions = decide(view);
-        for (const Decision& decision : decisions) {
-            // A link can be renamed, but not by a client of this tree: the kernel forgets
-            // the new name at the next start, and leases and settings are found by name.
-            const bool readOnly = decision.property == Properties::Name;
-            if (explain == Explain::Yes) {
-                builder.origin(describe(decision.origin) + ": " + std::string{decision.reason});
-            }
-            builder.property(decision.property, decision.value, readOnly);
+        const Snapshot::Index known = unchanged ? unchanged->find(view) : Snapshot::none;
+        if (known != Snapshot::none) {
+            builder.copy(*before->tree, known, network);
+        } else {
+            addInterface(machine, view, network, explain, diagnostics, builder);
         }
-        addLeases({.machine = machine, .view = view, .decisions = decisions, .node = interface},
-                  explain, builder);
-        addDiagnostics(machine, view, decisions, diagnostics);
     }
     if (machine.serviceProcessor()) {
         if (explain == Explain::Yes) {
@@ -123,6 +175,17 @@ std::shared_ptr<const Snapshot> decide(const Machine& machine, Explain explain) 
         builder.diagnostic(std::move(diagnostic));
     }
     return builder.build();
+}
+
+}  // namespace
+
+std::shared_ptr<const Snapshot> decide(const Machine& machine, Explain explain) {
+    return treeOf(machine, explain, nullptr);
+}
+
+Decided decide(std::unique_ptr<const Machine> machine, const Decided& before) {
+    auto tree = treeOf(*machine, Explain::No, &before);
+    return {.machine = std::move(machine), .tree = std::move(tree)};
 }
 
 }  // namespace ZR::Live

@@ -40,7 +40,17 @@ struct Decision {
 [[nodiscard]] std::shared_ptr<const Snapshot> decide(const Machine& machine,
                                                      Explain explain = Explain::No);
 
-/// The same. `now`: seconds since the epoch.
+/// A machine, and the tree that was decided of it without explanations.
+struct Decided {
+    std::unique_ptr<const Machine> machine;
+    std::shared_ptr<const Snapshot> tree;
+};
+
+/// The same tree. What did not change since another time, as is most of a machine with
+/// thousands of links, is taken from what was decided then.
+[[nodiscard]] Decided decide(std::unique_ptr<const Machine> machine, const Decided& before);
+
+/// The same as of a machine of these facts. `now`: seconds since the epoch.
 [[nodiscard]] std::shared_ptr<const Snapshot> decide(MachineFacts facts, std::int64_t now,
                                                      Explain explain = Explain::No);
 

@@ -9,7 +9,6 @@
 #include <unordered_set>
 #include <utility>
 
-#include "Decide.h"
 #include "StateReaders.h"
 #include "clients/Processes.h"
 #include "formats/Files.h"
@@ -86,7 +85,7 @@ void reportToLog(std::string_view message) {
 LiveMachine::LiveMachine(Surroundings surroundings)
     : surroundings_(std::move(surroundings)),
       buses_(std::move(surroundings_.buses)),
-      reader_(std::move(surroundings_.transport)),
+      network_(RtnetlinkReader{std::move(surroundings_.transport)}),
       processor_(
           surroundings_.ipmi ? std::move(surroundings_.ipmi) : ipmiDevice(surroundings_.roots),
           surroundings_.uptime),
@@ -171,7 +170,8 @@ std::shared_ptr<const Snapshot> LiveMachine::tryToRead() {
     ClientFacts clients = readClients();
     signals_.follow(clients);
     buses_.consult(clients, surroundings_.uptime());
-    NetworkState network = reader_.read(std::chrono::steady_clock::now() + kernelTime);
+    NetworkState network =
+        network_.read(monitor_.takeNetworkChanges(), std::chrono::steady_clock::now() + kernelTime);
     std::move(network.diagnostics.begin(), network.diagnostics.end(),
               std::back_inserter(clients.diagnostics));
     if (!network.certain) {
@@ -195,14 +195,19 @@ std::shared_ptr<const Snapshot> LiveMachine::tryToRead() {
     hasNetwork_ = std::ranges::any_of(
         network.links, [](const Link& link) { return link.arphrdType != ARPHRD_LOOPBACK; });
     unfinished_ = monitor_.isMarked() ? unfinished_ + 1 : 0;
-    const Machine machine{{.hostName = std::move(system.name),
-                           .links = std::move(network.links),
-                           .addresses = std::move(network.addresses),
-                           .clients = std::move(clients),
-                           .serviceProcessor = processor},
-                          readAt_};
-    changesAt_ = machine.changesAt();
-    return decide(machine, surroundings_.explain);
+    auto machine =
+        std::make_unique<const Machine>(MachineFacts{.hostName = std::move(system.name),
+                                                     .links = std::move(network.links),
+                                                     .addresses = std::move(network.addresses),
+                                                     .clients = std::move(clients),
+                                                     .serviceProcessor = processor},
+                                        readAt_);
+    changesAt_ = machine->changesAt();
+    if (surroundings_.explain == Explain::Yes) {
+        return decide(*machine, Explain::Yes);
+    }
+    decided_ = decide(std::move(machine), decided_);
+    return decided_.tree;
 }
 
 /// The end of a program may change nothing else that is watched.

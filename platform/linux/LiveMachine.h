@@ -11,14 +11,15 @@
 #include <unordered_set>
 #include <vector>
 
+#include "Decide.h"
 #include "Unannounced.h"
 #include "clients/ManagerBuses.h"
 #include "clients/ManagerSignals.h"
 #include "formats/Files.h"
 #include "ipmi/IpmiReader.h"
 #include "kernel/ChangeMonitor.h"
+#include "kernel/KeptNetwork.h"
 #include "kernel/NetlinkTransport.h"
-#include "kernel/RtnetlinkReader.h"
 #include "zrclient/SnapshotSource.h"
 #include "zrlinux/LiveSource.h"
 
@@ -63,9 +64,10 @@ class LiveMachine final : public SnapshotSource {
     Surroundings surroundings_;
     ManagerBuses buses_;
     ManagerSignals signals_;
-    RtnetlinkReader reader_;
+    KeptNetwork network_;
     ChangeMonitor monitor_;
     IpmiReader processor_;
+    Decided decided_;  // at the last reading; none where it is to be explained
     std::vector<WatchedPlace> places_;
     Unannounced unannounced_;
     std::int64_t readAt_ = 0;                   // when the last snapshot was made

@@ -4,6 +4,7 @@
 #include <linux/rtnetlink.h>
 
 #include <algorithm>
+#include <numeric>
 #include <set>
 #include <utility>
 
@@ -12,6 +13,10 @@
 
 namespace ZR::Live {
 namespace {
+
+// An order by name costs as much as many walks over all interfaces, and on most machines few
+// are looked for by name.
+constexpr std::size_t mostWalks = 32;
 
 const Address* addressOf(const Lease& lease, const InterfaceView& view) {
     const auto found =
@@ -146,6 +151,15 @@ std::optional<bool> InterfaceView::isHeardBy(const ClientProcess& process) const
                               : std::nullopt;
 }
 
+bool InterfaceView::isPlain() const {
+    const bool alone = leases.empty() && leases6.empty() && ended.empty() && managements.empty() &&
+                       configurations.empty() && processes.empty() && socket == nullptr &&
+                       openSocket == nullptr && strayed == nullptr && !unheard && !unheard6;
+    return alone && !enslaved && std::ranges::all_of(addresses, [](const Address& each) {
+               return each.validLifetime == Address::infinite;
+           });
+}
+
 Machine::Machine(MachineFacts facts, std::int64_t now) : facts_(std::move(facts)), now_(now) {
     sortByIndex(facts_.links);
     sortByIndex(facts_.addresses);
@@ -190,13 +204,6 @@ void Machine::collectInterfaces() {
             view.enslaved = isEnslaved(link);
         }
     }
-    byName_.resize(views_.size());
-    for (std::size_t i = 0; i < byName_.size(); ++i) {
-        byName_[i] = i;
-    }
-    std::sort(byName_.begin(), byName_.end(), [&](std::size_t a, std::size_t b) {
-        return views_[a].link->name < views_[b].link->name;
-    });
 }
 
 void Machine::collectLeases() {
@@ -403,6 +410,18 @@ InterfaceView* Machine::find(std::uint32_t ifindex) {
 }
 
 InterfaceView* Machine::find(const InterfaceName& name) {
+    if (walks_ < mostWalks) {
+        ++walks_;
+        const auto found = std::ranges::find_if(
+            views_, [&](const InterfaceView& view) { return view.link->name == name; });
+        return found == views_.end() ? nullptr : &*found;
+    }
+    if (byName_.empty()) {
+        byName_.resize(views_.size());
+        std::iota(byName_.begin(), byName_.end(), std::size_t{0});
+        std::ranges::sort(byName_, {},
+                          [&](std::size_t position) { return views_[position].link->name; });
+    }
     const auto found = std::lower_bound(byName_.begin(), byName_.end(), name,
                                         [&](std::size_t position, const InterfaceName& wanted) {
                                             return views_[position].link->name < wanted;

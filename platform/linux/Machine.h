@@ -51,6 +51,11 @@ struct InterfaceView {
     std::optional<Client> unheard6{};
     const Address* address = nullptr;  ///< the one that was decided on
 
+    /// Whether nothing is known of it beside its link, and addresses without an end: what it
+    /// is in the tree then follows from these and from `hidden` alone, and it has no leases
+    /// and no diagnostics.
+    [[nodiscard]] bool isPlain() const;
+
     /// The first program that runs and takes an address of the link by DHCP of this family;
     /// null for none.
     [[nodiscard]] const LinkConfiguration* dhcpManagement(bool ipv6) const;
@@ -142,7 +147,8 @@ class Machine {
     std::int64_t changesAt_ = Lease::never;
     std::optional<Lease> bootLease_;
     std::vector<InterfaceView> views_;  // by ifindex
-    std::vector<std::size_t> byName_;   // positions in views_, by name
+    std::vector<std::size_t> byName_;   // positions in views_, by name; made when it pays
+    std::size_t walks_ = 0;             // over views_, for want of it
     std::vector<Holder> byAddress_;     // by address; made when it is first asked for
 };
 

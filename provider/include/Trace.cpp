@@ -105,6 +105,35 @@ struct Buffer {
     }
 };
 
+/// Those of one thread, and how often any of them was filled.
+struct Buffers {
+    Buffer textVariable;
+    Buffer numberVariable;
+    Buffer plain;
+    Buffer withParameters;
+    unsigned formattings;
+};
+
+/// In a shared library the address of a thread's variable takes a call, and the compiler makes
+/// that call for every piece of a line where it can see through to it.
+#ifdef __clang__
+[[gnu::noinline]]
+#else
+[[gnu::noipa]]
+#endif
+Buffers&
+buffersOfThread() {
+    static thread_local Buffers buffers{};
+    return buffers;
+}
+
+/// The buffers for a formatting, which is counted.
+Buffers& toBeFilled() {
+    Buffers& buffers = buffersOfThread();
+    ++buffers.formattings;
+    return buffers;
+}
+
 /// Formats a text that fits. Literals have sizes known to the compiler here, which
 /// turns the copying of each into a few moves.
 template <const Format& format, std::size_t... index, typename... Arguments>
@@ -138,11 +167,9 @@ std::size_t formatCut(Buffer& buffer, const Format& format,
     return size;
 }
 
-/// Formats into the buffer, up to its last byte, which stays zero. Never inlined:
-/// in a shared library the address of a thread's buffer takes a call, and the
-/// compiler would make that call for every piece.
+/// Formats into the buffer, up to its last byte, which stays zero.
 template <const Format& format, std::same_as<Argument>... Arguments>
-[[gnu::noinline]] std::string_view formatAll(Buffer& buffer, const Arguments&... arguments) {
+std::string_view formatAll(Buffer& buffer, const Arguments&... arguments) {
     static_assert(sizeof...(arguments) == format.arguments);
     const std::size_t size = format.literalSize + (arguments.text.size() + ...);
     if (size >= buffer.text.size()) {
@@ -166,23 +193,25 @@ constexpr const char* markFile = "include/Trace";
 
 namespace TraceText {
 
+const unsigned& formattings() noexcept {
+    return buffersOfThread().formattings;
+}
+
 std::string_view variable(std::string_view name, std::string_view file, unsigned line,
                           std::string_view value) {
-    static thread_local Buffer buffer{};
-    return formatAll<textVariable>(buffer, Argument(name), Argument(value), Argument(line),
-                                   Argument(file));
+    return formatAll<textVariable>(toBeFilled().textVariable, Argument(name), Argument(value),
+                                   Argument(line), Argument(file));
 }
 
 std::string_view variable(std::string_view name, std::string_view file, unsigned line,
                           unsigned value) {
-    static thread_local Buffer buffer{};
-    return formatAll<numberVariable>(buffer, Argument(name), Argument(value), Argument(line),
-                                     Argument(file));
+    return formatAll<numberVariable>(toBeFilled().numberVariable, Argument(name), Argument(value),
+                                     Argument(line), Argument(file));
 }
 
 std::string_view plain(std::string_view file, std::string_view function, unsigned line,
                        MessageType type) {
-    static thread_local Buffer buffer{};
+    Buffer& buffer = toBeFilled().plain;
     const Argument where(file);
     const Argument what(function);
     const Argument at(line);
@@ -202,7 +231,7 @@ std::string_view plain(std::string_view file, std::string_view function, unsigne
 
 std::string_view withParameters(std::string_view file, std::string_view function, unsigned line,
                                 std::string_view parameters, MessageType type) {
-    static thread_local Buffer buffer{};
+    Buffer& buffer = toBeFilled().withParameters;
     const Argument where(file);
     const Argument what(function);
     const Argument at(line);

@@ -19,6 +19,7 @@
 #include <utility>
 
 #include "formats/Files.h"
+#include "kernel/Attributes.h"
 
 namespace ZR::Live {
 namespace {
@@ -120,6 +121,7 @@ void ChangeMonitor::openSubscription(std::vector<Diagnostic>& diagnostics) {
     if (subscription_) {
         return;
     }
+    network_.addAll();
     subscription_.reset(
         ::socket(AF_NETLINK, SOCK_RAW | SOCK_NONBLOCK | SOCK_CLOEXEC, NETLINK_ROUTE));
     sockaddr_nl address{};
@@ -301,20 +303,43 @@ int ChangeMonitor::watchAncestor(std::string directory, Arming& arming) const {
 bool ChangeMonitor::drainSubscription() {
     bool happened = false;
     for (int i = 0; i < longestDrain; ++i) {
-        // That something came is all that matters; one byte takes the whole message.
-        std::byte ignored{};
-        const ssize_t got = ::recv(subscription_.get(), &ignored, 1, MSG_DONTWAIT);
-        if (got >= 0 || errno == ENOBUFS) {
-            happened = true;  // ENOBUFS: more came than was kept
+        // Of which link it tells is all that matters; what does not fit is dropped.
+        std::array<std::byte, 64> message{};
+        const ssize_t got =
+            ::recv(subscription_.get(), message.data(), message.size(), MSG_DONTWAIT | MSG_TRUNC);
+        if (got >= 0) {
+            happened = true;
+            note(message, static_cast<std::size_t>(got));
+        } else if (errno == ENOBUFS) {
+            happened = true;  // more came than was kept
+            network_.addAll();
         } else if (errno == EAGAIN) {
             return happened;
         } else if (errno != EINTR) {
             subscription_.reset();
+            network_.addAll();
             blind_ = true;
             return true;
         }
     }
     return true;
+}
+
+/// Notes the link of a message of so many bytes, of which the first ones are here.
+void ChangeMonitor::note(std::span<const std::byte> message, std::size_t size) {
+    const auto body = message.subspan(NLMSG_HDRLEN);
+    const auto header = valueAt<nlmsghdr>(message);
+    const auto link = valueAt<ifinfomsg>(body);
+    const auto address = valueAt<ifaddrmsg>(body);
+    const bool whole = header && link && address && header->nlmsg_len == size;
+    const std::uint16_t type = whole ? header->nlmsg_type : std::uint16_t{NLMSG_NOOP};
+    if (type == RTM_NEWLINK || type == RTM_DELLINK) {
+        network_.add(static_cast<std::uint32_t>(link->ifi_index));
+    } else if (type == RTM_NEWADDR || type == RTM_DELADDR) {
+        network_.add(address->ifa_index);
+    } else {
+        network_.addAll();
+    }
 }
 
 bool ChangeMonitor::drainWatches() {

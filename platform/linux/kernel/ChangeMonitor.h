@@ -2,13 +2,16 @@
 
 #include <poll.h>
 
+#include <cstddef>
 #include <cstdint>
 #include <map>
 #include <span>
 #include <string>
 #include <string_view>
+#include <utility>
 #include <vector>
 
+#include "kernel/NetworkChanges.h"
 #include "kernel/WatchedPlace.h"
 #include "zrclient/Diagnostic.h"
 #include "zrcommon/UniqueFd.h"
@@ -50,6 +53,12 @@ class ChangeMonitor {
     /// Whether something cannot be watched, so that changed() is always true.
     [[nodiscard]] bool isBlind() const noexcept { return blind_; }
 
+    /// What changed of the network since this was last asked, as far as changed() and begin()
+    /// have heard of it; all, at first.
+    [[nodiscard]] NetworkChanges takeNetworkChanges() {
+        return std::exchange(network_, NetworkChanges{.all = false});
+    }
+
     /// Makes changed() true until the next begin().
     void markChanged() noexcept { changed_ = true; }
 
@@ -69,10 +78,12 @@ class ChangeMonitor {
     int watchAncestor(std::string directory, Arming& arming) const;
     void announce(int descriptor);
     bool drainSubscription();
+    void note(std::span<const std::byte> message, std::size_t size);
     bool drainWatches();
     bool concerns(int watch, std::uint32_t mask, std::string_view name);
 
     UniqueFd subscription_;
+    NetworkChanges network_;
     UniqueFd watches_;
     Interests interests_;
     std::map<std::int32_t, UniqueFd> processes_;

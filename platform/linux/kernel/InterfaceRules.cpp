@@ -58,6 +58,7 @@ void WayOut::add(const Link& link, bool addressed) {
         return;
     }
     hasDevice_ = hasDevice_ || isDevice(link);
+    hasCable_ = hasCable_ || link.kind == "veth";
     if (isCableEnd(link) && link.farNamespace && (!where_ || (addressed && !addressed_))) {
         where_ = link.farNamespace;
         addressed_ = addressed;

@@ -30,8 +30,13 @@ class WayOut {
     /// Whether this is such a cable. To be called when all links were added.
     [[nodiscard]] bool isBy(const Link& link) const;
 
+    /// Whether there are cables and no device, so that it counts where a cable leads.
+    /// Likewise.
+    [[nodiscard]] bool mayBeByCable() const { return !hasDevice_ && hasCable_; }
+
   private:
     bool hasDevice_ = false;
+    bool hasCable_ = false;
     bool addressed_ = false;  // the cable by which it is known where the way leads
     std::optional<std::int32_t> where_;
 };

@@ -9,6 +9,7 @@
 #include <array>
 #include <cerrno>
 #include <cstdint>
+#include <cstring>
 #include <optional>
 #include <span>
 #include <utility>
@@ -47,6 +48,7 @@ struct RtnetlinkReader::Outcome {
         Failed,
     };
     End end = End::Failed;
+    int refusal = 0;  // the errno of a response that refuses
     std::string reason;
     std::size_t unreadable = 0;  // messages that cannot be parsed
     bool interrupted = false;
@@ -58,15 +60,40 @@ RtnetlinkReader::RtnetlinkReader(std::unique_ptr<NetlinkTransport> transport)
 NetworkState RtnetlinkReader::read(Deadline deadline) {
     NetworkState state;
     held_ = {};
-    if (dump(RTM_GETLINK, "links", parseLink, state.links, state, deadline)) {
+    if (dump({RTM_GETLINK}, "links", parseLink, state.links, state, deadline)) {
         // Without links there is nothing that an address could belong to.
-        dump(RTM_GETADDR, "addresses", parseAddress, state.addresses, state, deadline);
+        dump({RTM_GETADDR}, "addresses", parseAddress, state.addresses, state, deadline);
     }
     return state;
 }
 
+std::optional<NetworkState> RtnetlinkReader::readLink(std::uint32_t ifindex, Deadline deadline) {
+    using End = Outcome::End;
+    std::optional<NetworkState> state{std::in_place};
+    held_ = {};
+    const Outcome link = dumpOnce({RTM_GETLINK, ifindex}, parseLink, state->links, deadline);
+    if (link.refusal == ENODEV) {
+        return state;
+    }
+    if (link.end != End::Complete || link.unreadable != 0) {
+        return std::nullopt;
+    }
+    const Outcome addresses =
+        dumpOnce({RTM_GETADDR, ifindex}, parseAddress, state->addresses, deadline);
+    if (addresses.end != End::Complete || addresses.unreadable != 0) {
+        return std::nullopt;
+    }
+    std::erase_if(state->addresses,
+                  [ifindex](const Address& address) { return address.ifindex != ifindex; });
+    return state;
+}
+
+bool RtnetlinkReader::Request::isForOneLink() const {
+    return type == RTM_GETLINK && ifindex != 0;
+}
+
 template <typename Fact, typename Parse>
-bool RtnetlinkReader::dump(std::uint16_t request, const char* what, Parse parse,
+bool RtnetlinkReader::dump(const Request& request, const char* what, Parse parse,
                            std::vector<Fact>& facts, NetworkState& state, Deadline deadline) {
     using End = Outcome::End;
     Outcome outcome;
@@ -99,7 +126,7 @@ bool RtnetlinkReader::dump(std::uint16_t request, const char* what, Parse parse,
 }
 
 template <typename Fact, typename Parse>
-RtnetlinkReader::Outcome RtnetlinkReader::dumpOnce(std::uint16_t request, Parse parse,
+RtnetlinkReader::Outcome RtnetlinkReader::dumpOnce(const Request& request, Parse parse,
                                                    std::vector<Fact>& facts, Deadline deadline) {
     using End = Outcome::End;
     Outcome outcome;
@@ -145,7 +172,7 @@ RtnetlinkReader::Outcome RtnetlinkReader::dumpOnce(std::uint16_t request, Parse 
 
 /// Takes the messages of one datagram. True when the dump is over.
 template <typename Fact, typename Parse>
-bool RtnetlinkReader::take(std::size_t size, std::uint16_t request, Parse parse,
+bool RtnetlinkReader::take(std::size_t size, const Request& request, Parse parse,
                            std::vector<Fact>& facts, Outcome& outcome) const {
     using End = Outcome::End;
     std::span<const std::byte> rest = std::span{buffer_}.first(size);
@@ -172,9 +199,14 @@ bool RtnetlinkReader::take(std::size_t size, std::uint16_t request, Parse parse,
                 return true;
             case NLMSG_ERROR:
                 if (code && *code == 0) {
-                    break;  // an acknowledgement
+                    if (!request.isForOneLink()) {
+                        break;  // an acknowledgement
+                    }
+                    outcome.end = facts.size() == 1 ? End::Complete : End::Lost;
+                    return true;
                 }
-                outcome.reason = "refused: " + reasonOf(errorIn(code));
+                outcome.refusal = errorIn(code);
+                outcome.reason = "refused: " + reasonOf(outcome.refusal);
                 return true;
             case NLMSG_DONE:
                 if (code && *code < 0) {
@@ -186,7 +218,7 @@ bool RtnetlinkReader::take(std::size_t size, std::uint16_t request, Parse parse,
                 return true;
             default:
                 // A response's type is its request's less two.
-                if (message->nlmsg_type != request - 2) {
+                if (message->nlmsg_type != request.type - 2) {
                     break;
                 }
                 if (auto fact = parse(bytes)) {
@@ -202,7 +234,7 @@ bool RtnetlinkReader::take(std::size_t size, std::uint16_t request, Parse parse,
     return false;
 }
 
-int RtnetlinkReader::ask(std::uint16_t request) {
+int RtnetlinkReader::ask(const Request& request) {
     if (!open_) {
         if (const int error = transport_->open(); error != 0) {
             return error;
@@ -211,15 +243,20 @@ int RtnetlinkReader::ask(std::uint16_t request) {
     }
     alignas(nlmsghdr) std::array<std::byte, 64> space{};
     nlmsghdr* const message = ::mnl_nlmsg_put_header(space.data());
-    message->nlmsg_type = request;
-    message->nlmsg_flags = NLM_F_REQUEST | NLM_F_DUMP;
+    message->nlmsg_type = request.type;
+    // One link comes without an end of its own, which the acknowledgement is then.
+    message->nlmsg_flags = NLM_F_REQUEST | (request.isForOneLink() ? NLM_F_ACK : NLM_F_DUMP);
     message->nlmsg_seq = ++sequence_;
-    if (request == RTM_GETLINK) {
-        ::mnl_nlmsg_put_extra_header(message, sizeof(ifinfomsg));
+    if (request.type == RTM_GETLINK) {
+        ifinfomsg info{};
+        info.ifi_index = static_cast<int>(request.ifindex);
+        std::memcpy(::mnl_nlmsg_put_extra_header(message, sizeof info), &info, sizeof info);
         // The counters are a quarter of the response, and are not needed.
         ::mnl_attr_put_u32(message, IFLA_EXT_MASK, RTEXT_FILTER_SKIP_STATS);
     } else {
-        ::mnl_nlmsg_put_extra_header(message, sizeof(ifaddrmsg));
+        ifaddrmsg info{};
+        info.ifa_index = request.ifindex;
+        std::memcpy(::mnl_nlmsg_put_extra_header(message, sizeof info), &info, sizeof info);
     }
     const auto asking = std::chrono::steady_clock::now();
     const int error = transport_->send(std::span{space}.first(message->nlmsg_len));

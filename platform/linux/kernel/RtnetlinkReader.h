@@ -3,6 +3,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -37,18 +38,30 @@ class RtnetlinkReader {
     /// which is then there, is still read; but no request is sent again after the deadline.
     [[nodiscard]] NetworkState read(Deadline deadline);
 
+    /// Reads one link and its addresses, in the order in which read() has them: empty when
+    /// there is no such link. nullopt when that cannot be known for certain. The same holds
+    /// as of read(). A kernel before Linux 4.20 sends the addresses of all links for it.
+    [[nodiscard]] std::optional<NetworkState> readLink(std::uint32_t ifindex, Deadline deadline);
+
   private:
     struct Outcome;
+    /// A dump of all links or addresses; or one link, or the addresses of one.
+    struct Request {
+        std::uint16_t type = 0;
+        std::uint32_t ifindex = 0;
+
+        [[nodiscard]] bool isForOneLink() const;
+    };
     template <typename Fact, typename Parse>
-    bool dump(std::uint16_t request, const char* what, Parse parse, std::vector<Fact>& facts,
+    bool dump(const Request& request, const char* what, Parse parse, std::vector<Fact>& facts,
               NetworkState& state, Deadline deadline);
     template <typename Fact, typename Parse>
-    Outcome dumpOnce(std::uint16_t request, Parse parse, std::vector<Fact>& facts,
+    Outcome dumpOnce(const Request& request, Parse parse, std::vector<Fact>& facts,
                      Deadline deadline);
     template <typename Fact, typename Parse>
-    bool take(std::size_t size, std::uint16_t request, Parse parse, std::vector<Fact>& facts,
+    bool take(std::size_t size, const Request& request, Parse parse, std::vector<Fact>& facts,
               Outcome& outcome) const;
-    int ask(std::uint16_t request);
+    int ask(const Request& request);
 
     std::unique_ptr<NetlinkTransport> transport_;
     bool open_ = false;

@@ -1,7 +1,9 @@
 #include "zrclient/Snapshot.h"
 
 #include <algorithm>
+#include <bit>
 #include <cstddef>
+#include <functional>
 #include <map>
 #include <utility>
 
@@ -11,6 +13,9 @@ namespace {
 
 /// A name as a segment of a path, in which a "/" cannot be taken for a separator.
 std::string escaped(std::string_view name) {
+    if (name.find_first_of("/%") == std::string_view::npos) {
+        return std::string{name};
+    }
     std::string key;
     key.reserve(name.size());
     for (const char character : name) {
@@ -39,28 +44,59 @@ std::string_view nameOf(const Snapshot::Node& node, std::span<const SnapshotProp
     return node.description;
 }
 
+/// Gives back the room that is not needed, where it is worth moving all that is there.
+template <typename Element>
+void release(std::vector<Element>& elements) {
+    if (elements.capacity() - elements.size() > elements.size() / 8) {
+        elements.shrink_to_fit();
+    }
+}
+
 /// Gives nodes, in document order, keys that their siblings do not have: the first of
 /// several siblings with one name keeps it bare.
 class Keys {
   public:
-    void give(Snapshot::Node& node, std::string_view name) {
+    explicit Keys(std::span<Snapshot::Node> nodes)
+        : nodes_(nodes), table_(std::bit_ceil(2 * nodes.size() + 1), Snapshot::none) {}
+
+    void give(Snapshot::Index index, std::string_view name) {
+        Snapshot::Node& node = nodes_[index];
         node.key = escaped(name);
-        const auto [place, isNew] = numbers_.try_emplace({node.parent, node.key}, 1U);
-        if (isNew) {
+        if (take(index)) {
             return;
         }
         // The count goes on from where the last namesake left it, else many
         // namesakes would take quadratic time.
         const std::string bare = node.key;
+        std::uint32_t& number = numbers_.try_emplace({node.parent, bare}, 1U).first->second;
         do {
-            node.key = bare + "#" + std::to_string(++place->second);
-        } while (!numbers_.try_emplace({node.parent, node.key}, 1U).second);
+            node.key = bare + "#" + std::to_string(++number);
+        } while (!take(index));
     }
 
   private:
-    /// The keys given so far, which the nodes hold, each with the number that its last
-    /// namesake has.
-    std::map<std::pair<Snapshot::Index, std::string_view>, std::uint32_t> numbers_;
+    /// Enters a node by its key; false when a sibling has it.
+    bool take(Snapshot::Index index) {
+        const Snapshot::Node& node = nodes_[index];
+        const std::size_t mask = table_.size() - 1;
+        for (std::size_t at = std::hash<std::string_view>{}(node.key) + node.parent;; ++at) {
+            Snapshot::Index& entered = table_[at & mask];
+            if (entered == Snapshot::none) {
+                entered = index;
+                return true;
+            }
+            if (nodes_[entered].parent == node.parent && nodes_[entered].key == node.key) {
+                return false;
+            }
+        }
+    }
+
+    std::span<Snapshot::Node> nodes_;
+    /// The nodes that have a key by now, by its hash, each in the first place from there that
+    /// was free. A map would take longer for ten thousand than all else that building does.
+    std::vector<Snapshot::Index> table_;
+    /// The number that the last namesake of a key has, where it has any.
+    std::map<std::pair<Snapshot::Index, std::string>, std::uint32_t> numbers_;
 };
 
 }  // namespace
@@ -160,6 +196,19 @@ void SnapshotBuilder::property(NodeLexicon::Properties id, PropertyValue value, 
     }
 }
 
+void SnapshotBuilder::copy(const Snapshot& from, Snapshot::Index index, Snapshot::Index parent) {
+    const Snapshot::Node& original = from.node(index);
+    const auto properties = from.properties(index);
+    Snapshot::Node& node = nodes_[add(parent, original.type, original.description)];
+    node.propertyCount = original.propertyCount;
+    properties_.insert(properties_.end(), properties.begin(), properties.end());
+}
+
+void SnapshotBuilder::reserve(std::size_t nodes, std::size_t properties) {
+    nodes_.reserve(nodes);
+    properties_.reserve(properties);
+}
+
 std::shared_ptr<const Snapshot> SnapshotBuilder::build() {
     Snapshot snapshot;
     snapshot.nodes_ = std::exchange(nodes_, {});
@@ -168,17 +217,17 @@ std::shared_ptr<const Snapshot> SnapshotBuilder::build() {
     origin_.clear();
     snapshot.diagnostics_ = std::exchange(diagnostics_, {});
     // A snapshot is kept much longer than it takes to build it.
-    snapshot.nodes_.shrink_to_fit();
-    snapshot.properties_.shrink_to_fit();
+    release(snapshot.nodes_);
+    release(snapshot.properties_);
 
-    Keys keys;
+    Keys keys{snapshot.nodes_};
     std::array<Snapshot::Index*, NodeLexicon::nodeTypes.size()> nextOfType{};
     for (std::size_t place = 0; place < nextOfType.size(); ++place) {
         nextOfType.at(place) = &snapshot.firstOfType_.at(place);
     }
     for (Snapshot::Index index = 0; index < snapshot.nodes_.size(); ++index) {
         Snapshot::Node& node = snapshot.nodes_[index];
-        keys.give(node, nameOf(node, snapshot.properties(index)));
+        keys.give(index, nameOf(node, snapshot.properties(index)));
         const auto type = NodeLexicon::nodeTypeOf(node.type);
         if (const auto place = type ? NodeLexicon::placeOf(*type) : std::nullopt) {
             *nextOfType.at(*place) = index;

@@ -56,6 +56,32 @@ TEST(Graph, ReferenceWithFewerKeysMeansTheSameInstance) {
     EXPECT_EQ(graph.edges, (std::vector<GraphEdge>{{"QVXZR_DHCPElementCapabilities", 1, 2}}));
 }
 
+TEST(Graph, ReferenceThatNamesNoInstanceMeansTheFirst) {
+    ObjectPath any = endpoint("");
+    any.keys.pop_back();
+    const Graph graph = connect({capabilities("eth1"), endpoint("eth0"), endpoint("eth1")},
+                                {association(any, capabilities("eth1"))});
+    EXPECT_EQ(graph.nodes.size(), 3U);
+    EXPECT_EQ(graph.edges, (std::vector<GraphEdge>{{"QVXZR_DHCPElementCapabilities", 1, 0}}));
+}
+
+TEST(Graph, ManyInstancesFindTheirOwn) {
+    std::vector<ObjectPath> elements;
+    std::vector<ObjectPath> associations;
+    std::vector<GraphEdge> edges;
+    constexpr std::size_t count = 10'000;
+    for (std::size_t i = 0; i < count; ++i) {
+        const std::string name = "eth" + std::to_string(i);
+        elements.push_back(endpoint(name));
+        associations.push_back(association(endpoint(name), capabilities(name)));
+        edges.push_back({"QVXZR_DHCPElementCapabilities", i, 2 * count - 1 - i});
+    }
+    for (std::size_t i = count; i-- > 0;) {
+        elements.push_back(capabilities("eth" + std::to_string(i)));
+    }
+    EXPECT_EQ(connect(elements, associations).edges, edges);
+}
+
 TEST(Graph, ReferenceToNothingServedGetsANodeOnce) {
     const Graph expected{
         {{endpoint("eth0"), true}, {endpoint("eth1"), true}, {capabilities("gone"), false}},

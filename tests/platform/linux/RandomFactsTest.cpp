@@ -8,6 +8,7 @@
 
 #include <array>
 #include <cstddef>
+#include <memory>
 #include <random>
 
 #include "Decide.h"
@@ -256,6 +257,44 @@ TEST(RandomFacts, TheTimesOfALeaseAreInOrder) {
         EXPECT_LE(timeOf(tree, node, Properties::LeaseObtained).value_or(0), now) << seed;
     });
     EXPECT_GT(times, 100);
+}
+
+TEST(RandomFacts, WhatIsTakenFromAnotherTimeIsWhatWouldBeDecided) {
+    Decided before;
+    int changed = 0;
+    for (int seed = 0; seed < machines && !testing::Test::HasFailure(); ++seed) {
+        // Of one machine, and of it with some of what another one has.
+        MachineFacts facts = RandomFacts{static_cast<unsigned>(seed)}.machine();
+        MachineFacts other = RandomFacts{static_cast<unsigned>(seed + machines)}.machine();
+        if (seed % 2 == 0) {
+            facts.clients = {};
+            other.clients.leases.clear();
+        }
+        before = decide(std::make_unique<const Machine>(facts, now), before);
+        EXPECT_EQ(*before.tree, *decide(facts, now)) << seed;
+        switch (seed % 5) {
+            case 0:
+                facts.links = other.links;
+                break;
+            case 1:
+                facts.addresses = other.addresses;
+                break;
+            case 2:
+                facts.clients = other.clients;
+                break;
+            case 3:
+                facts.links.back() = other.links.back();
+                break;
+            default:
+                facts.clients.processesHidden = !facts.clients.processesHidden;
+                break;
+        }
+        const auto old = before.tree;
+        before = decide(std::make_unique<const Machine>(facts, now + 1), before);
+        EXPECT_EQ(*before.tree, *decide(facts, now + 1)) << seed;
+        changed += *before.tree == *old ? 0 : 1;
+    }
+    EXPECT_GT(changed, machines / 4);
 }
 
 TEST(RandomFacts, NothingChangesBeforeItIsSaidTo) {

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <array>
+#include <cstddef>
 #include <cstdint>
 #include <memory>
 #include <span>
@@ -62,6 +63,7 @@ class Snapshot {
     };
 
     [[nodiscard]] std::span<const Node> nodes() const noexcept { return nodes_; }
+    [[nodiscard]] std::size_t propertyCount() const noexcept { return properties_.size(); }
     [[nodiscard]] const Node& node(Index index) const { return nodes_[index]; }
     [[nodiscard]] std::span<const SnapshotProperty> properties(Index index) const;
 
@@ -112,6 +114,13 @@ class SnapshotBuilder {
     /// Adds a property to the node added last. One that is there already is
     /// replaced in its place. Without a node there is nothing to add to.
     void property(NodeLexicon::Properties id, PropertyValue value, bool readOnly = false);
+
+    /// Adds a node as another snapshot has it, with its properties, without what is below it,
+    /// its origins and its key.
+    void copy(const Snapshot& from, Snapshot::Index index, Snapshot::Index parent);
+
+    /// Makes room for so many in all.
+    void reserve(std::size_t nodes, std::size_t properties);
 
     /// Says where the properties that are added from now on come from. Costs nothing as
     /// long as it is not called.
