@@ -495,6 +495,20 @@ class ServiceCapabilitiesClass final : public SubscriptionClass {
     }
 };
 
+/// What the service can do is told by its capabilities.
+class CapabilitiesOfServiceClass final : public SubscriptionClass {
+  public:
+    using SubscriptionClass::SubscriptionClass;
+
+    [[nodiscard]] std::vector<Instance> instances(const std::string& /*nameSpace*/) const override {
+        return {instanceAt({"",
+                            interop,
+                            className(),
+                            {{"ManagedElement", ofReference(pathOf(serviceClass, serviceName))},
+                             {"Capabilities", ofReference(capabilitiesPath())}}})};
+    }
+};
+
 /// The service acts on all filters and destinations.
 class AffectedClass final : public SubscriptionClass {
   public:
@@ -534,6 +548,8 @@ std::vector<std::unique_ptr<OwnClass>> subscriptionClasses(
     all.push_back(std::make_unique<SubscribedClass>(subscriptionClass, store, manager));
     all.push_back(std::make_unique<ServiceClass>(serviceClass, store, manager));
     all.push_back(std::make_unique<ServiceCapabilitiesClass>(capabilitiesClass, store, manager));
+    all.push_back(
+        std::make_unique<CapabilitiesOfServiceClass>("CIM_ElementCapabilities", store, manager));
     all.push_back(std::make_unique<AffectedClass>("CIM_ServiceAffectsElement", store, manager));
     return all;
 }

@@ -519,6 +519,13 @@ TEST_F(SubscriptionRequests, TheServiceTellsHowItDelivers) {
     EXPECT_EQ(get(service.front()->path), *service.front());
     EXPECT_EQ(get(capabilities.front()->path), *capabilities.front());
     EXPECT_THAT(all("CIM_ServiceAffectsElement"), SizeIs(1));
+    const auto between = all("CIM_ElementCapabilities");
+    ASSERT_THAT(between, SizeIs(1));
+    EXPECT_EQ(get(between.front()->path), *between.front());
+    AssociationRequest ofService;
+    ofService.assocClass = "CIM_ElementCapabilities";
+    const auto capable = manager_->associators(service.front()->path, ofService);
+    EXPECT_EQ(capable.instances, capabilities);
 }
 
 }  // namespace
