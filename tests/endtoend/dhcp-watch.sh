@@ -36,10 +36,13 @@ disown  # its end is no news
 
 # Each line with the moment at which it came.
 watched=$work/watched
+stamp() {
+    local line
+    while IFS= read -r line; do echo "$EPOCHREALTIME $line"; done >"$watched"
+}
 : >"$watched"
 in_client env LC_ALL=C ZR_LOG_SINK=stderr ZR_DATA_DIR="$work/data" "$program" watch \
-    2>"$work/told" |
-    while IFS= read -r line; do echo "$EPOCHREALTIME $line"; done >"$watched" &
+    > >(stamp) 2>"$work/told" &
 watch=$!
 eventually grep -q watching "$work/told" || fail "it does not watch: $(<"$work/told")"
 
