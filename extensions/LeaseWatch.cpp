@@ -21,7 +21,9 @@ namespace ZR::DHCPClientExtensions {
 
 namespace {
 
-constexpr std::array watchedClasses{"QVXZR_DHCPLease", "QVXZR_DHCPProtocolEndpoint"};
+// An interface without a lease, and an address that is of no lease, show in the last one alone.
+constexpr std::array watchedClasses{"QVXZR_DHCPLease", "QVXZR_DHCPProtocolEndpoint",
+                                    "QVXZR_DHCPInterface"};
 
 /// How long a function of the provider waits until what there is has been seen, so that
 /// everything later is told.

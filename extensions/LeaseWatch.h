@@ -15,7 +15,7 @@
 
 namespace ZR::DHCPClientExtensions {
 
-/// Tells the object manager what happens to leases and endpoints: CIM_InstCreation,
+/// Tells the object manager what happens to leases, endpoints and interfaces: CIM_InstCreation,
 /// CIM_InstModification and CIM_InstDeletion, as clients would see the instances.
 ///
 /// It has one thread while indications are enabled and a filter is active, and none else.

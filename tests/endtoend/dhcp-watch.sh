@@ -9,7 +9,9 @@
 # It takes one and a half times the shortest lease that all clients accept, nearly all of it
 # waiting.
 #
-# Usage: dhcp-watch.sh PATH-OF-cimdhcp CLIENT     CLIENT: one of the set-ups of dhcp-clients.sh
+# Usage: dhcp-watch.sh PATH-OF-cimdhcp CLIENT [SECONDS]
+# CLIENT: one of the set-ups of dhcp-clients.sh; SECONDS: what an event may take instead, where
+# the program is slow.
 set -euo pipefail
 
 program=$1
@@ -27,17 +29,20 @@ case $kind in
     udhcpc) file_of_lease=$state_file ;;
     dhcpcd) file_of_lease=/var/lib/dhcpcd/eth1.lease ;;
 esac
-limit=0.9
+limit=${3:-0.9}
 
 in_client env TZ=UTC0 ip -o -ts monitor link address >"$work/kernel" 2>&1 &
 disown  # its end is no news
 
 # Each line with the moment at which it came.
 watched=$work/watched
+stamp() {
+    local line
+    while IFS= read -r line; do echo "$EPOCHREALTIME $line"; done >"$watched"
+}
 : >"$watched"
 in_client env LC_ALL=C ZR_LOG_SINK=stderr ZR_DATA_DIR="$work/data" "$program" watch \
-    2>"$work/told" |
-    while IFS= read -r line; do echo "$EPOCHREALTIME $line"; done >"$watched" &
+    > >(stamp) 2>"$work/told" &
 watch=$!
 eventually grep -q watching "$work/told" || fail "it does not watch: $(<"$work/told")"
 
@@ -89,24 +94,38 @@ kernel_says() {
 client_writes() {
     signs+=("$(in_client stat -c %.Y "$file_of_lease")")
 }
-# in_time: it was told in time after the last of them.
+# in_time: it was told in time after the last of them. While other tests make or remove a
+# thousand links, the kernel lets everyone wait who asks for links: that long an event may take
+# besides.
 in_time() {
-    local delay
-    delay=$(printf '%s\n' "${signs[@]}" | sort -g |
-        awk -v told="$told_at" 'END { printf "%.3f", told - $1 }')
+    local delay wait
+    read -r delay wait < <(printf '%s\n' "${signs[@]}" | sort -g |
+        awk -v told="$told_at" 'NR == FNR { sign = $1; next }
+            $2 > sign && $2 - $1 > wait { wait = $2 - $1 }
+            END { printf "%.3f %.3f\n", told - sign, wait }' - "$work/waits")
     signs=()
     printf '%-20s %7s s\n' "$moment" "$delay"
-    awk -v delay="$delay" -v limit="$limit" 'BEGIN { exit !(delay < limit) }' ||
-        refuse "told $delay s after its sign"
+    awk -v delay="$delay" -v limit="$limit" -v wait="$wait" \
+        'BEGIN { exit !(delay < limit + wait) }' ||
+        refuse "told $delay s after its sign, and the kernel lets wait for $wait s"
 }
-
+while :; do
+    asked_at=$EPOCHREALTIME
+    ip -n "$client" link show eth1 >/dev/null 2>&1 || break
+    echo "$asked_at $EPOCHREALTIME"
+    sleep 0.5
+done >"$work/waits" &
+disown  # it ends with the client's machine
+server_listens() { [[ -n $(in_server ss -Huln 'sport = :67') ]]; }
 # What passes by while a client asks for an address, or starts again.
 asking='-> (asking|off)|(asking|off) -> '
 
+# The server is in the client's file, which a busy machine may write some time after the address.
+leased='198\.51\.100\.1[0-9]*'
 start_server
 begins "a lease"
 start_client
-tells '-> bound 198\.51\.100\.1[0-9]* from 198\.51\.100\.1$' "$asking"
+tells "(-> bound $leased|bound $leased ->) from 198\.51\.100\.1\$" "$asking|-> bound $leased\$"
 address=$(kernel_address)
 kernel_says " inet $address/"
 client_writes
@@ -116,10 +135,13 @@ stop_server
 rm -f "$work/server.leases"
 range=198.51.100.200,198.51.100.220
 start_server
+# A request to renew that finds none is not repeated soon.
+eventually server_listens || refuse "no server: $(<"$work/dnsmasq.log")"
 begins "another address"
 if declare -F ask_anew >/dev/null; then ask_anew; else renew_client; fi
-tells '(bound .* -> 198|(asking|off) -> bound 198)\.51\.100\.2[0-9]* from 198\.51\.100\.1$' \
-    "$asking"
+leased='198\.51\.100\.2[0-9]*'
+tells "(-> (bound )?$leased|bound $leased ->) from 198\.51\.100\.1\$" \
+    "$asking|-> (bound )?$leased\$"
 former=$address
 address=$(kernel_address)
 [[ $address != "$former" ]] || refuse "it has the same address"
@@ -149,20 +171,23 @@ stop_server
 start_short_server
 begins "a short lease"
 start_client
-tells '-> bound 198\.51\.100\.' '-> '
+leased='198\.51\.100\.1[0-9]*'
+tells "(-> bound $leased|bound $leased ->) from 198\.51\.100\.1\$" '-> '
 address=$(kernel_address)
 kernel_says " inet $address/"
 client_writes
 in_time
 begins "renewed"
-tells "bound $address, renewed until "
+tells "bound $address, renewed until |(renewing|rebinding|expired) $address -> bound" \
+    '-> (renewing|rebinding|expired)'
 kernel_may_say " inet $address/"
 client_writes
 in_time
 begins "expired"
 stop_short_server
-# The lease may end by the clock some moments before the kernel takes the address away.
-tells "(bound|renewing|rebinding|expired) $address -> asking" '-> (renewing|rebinding|expired)'
+# By what was written down, in whole seconds, the lease may end some moments before its client
+# takes the address away, and be unknown meanwhile.
+tells '-> asking$' '-> (renewing|rebinding|expired|\?)|\? -> bound'
 kernel_says "Deleted.* inet $address/"
 in_time
 

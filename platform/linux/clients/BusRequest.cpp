@@ -194,7 +194,7 @@ BusRequests::~BusRequests() = default;
 void BusRequests::open() {
     sd_bus* opened = nullptr;
     const int error = functions_->openSystem(&opened);
-    bus_.reset(opened);
+    bus_ = BusConnection(opened, CloseBus{functions_});
     if (error < 0) {
         bus_.reset();
         // Many a machine has such a program and no bus.

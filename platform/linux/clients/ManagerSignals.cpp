@@ -70,7 +70,7 @@ bool ManagerSignals::open() {
     }
     sd_bus* opened = nullptr;
     const int error = functions->openSystem(&opened);
-    bus_.reset(opened);
+    bus_ = BusConnection(opened, CloseBus{functions});
     if (error < 0 ||
         functions->awaitReady(opened, std::chrono::steady_clock::now() + timeToConnect) != 0) {
         return false;
@@ -86,7 +86,7 @@ bool ManagerSignals::heard() {
     if (!bus_) {
         return false;
     }
-    const auto functions = SdBus::get();
+    const auto functions = bus_.get_deleter().functions;
     bool announced = false;
     for (;;) {
         sd_bus_message* taken = nullptr;

@@ -57,8 +57,11 @@ class SdBus {
     std::string missing_;
 };
 
+/// Has the functions itself: a connection may outlive those of this process, at its end.
 struct CloseBus {
-    void operator()(sd_bus* bus) const noexcept { SdBus::get()->closeUnref(bus); }
+    std::shared_ptr<const SdBus> functions;
+
+    void operator()(sd_bus* bus) const noexcept { functions->closeUnref(bus); }
 };
 using BusConnection = std::unique_ptr<sd_bus, CloseBus>;
 

@@ -96,6 +96,30 @@ TEST_F(LeaseWatch, WhatComesChangesAndGoesIsToldOnceEach) {
     EXPECT_THAT(told_.take(), IsEmpty());
 }
 
+TEST_F(LeaseWatch, AnInterfaceIsToldWhereNoLeaseAndNoEndpointTells) {
+    test::Json asking = lease("");
+    asking["properties"] = {{"Family", "IPv4"}, {"Client", "udhcpc"}};
+    const auto interface = [&](const char* address) {
+        test::Json node = leased("eth0", asking);
+        node["properties"]["IPv4Address"] = address;
+        return node;
+    };
+    setTree({test::host({interface("192.0.2.17")})});
+    Told interfaces(Told::Interfaces::alone);
+    const auto active = subscribe(manager_, "SELECT * FROM CIM_InstIndication", interfaces);
+    const auto others = subscribe(manager_, "SELECT * FROM CIM_InstIndication", told_);
+    // A client that does not tell its state: whether it has a lease shows in the address alone.
+    setTree({test::host({interface("")})});
+    ASSERT_TRUE(interfaces.await(1));
+    EXPECT_THAT(interfaces.take(), ElementsAre(testing::StartsWith("Modification Interface eth0")));
+    test::Json fixed = test::dhcpInterface("eth5", {});
+    fixed["properties"]["DHCPEnabled"] = false;
+    setTree({test::host({interface(""), fixed})});
+    ASSERT_TRUE(interfaces.await(2));
+    EXPECT_THAT(interfaces.take(), ElementsAre(testing::StartsWith("Creation Interface eth5")));
+    EXPECT_THAT(told_.take(), IsEmpty());
+}
+
 TEST_F(LeaseWatch, AnIndicationHasWhatTheStandardAsksFor) {
     const auto active = subscribe(manager_, "SELECT * FROM CIM_InstModification", told_);
     setTree({test::host({leased("eth0", lease("192.0.2.40"))})});

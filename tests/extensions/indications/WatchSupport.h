@@ -53,6 +53,9 @@ inline std::string brief(const cimom::Instance& indication) {
     }
     std::string line = behind(indication.path.className, "CIM_Inst") + ' ' +
                        behind(source->path.className, "QVXZR_DHCP");
+    if (source->path.className == "QVXZR_DHCPInterface") {
+        return line + ' ' + text(source, "ElementName") + ' ' + text(source, "IPv4Address");
+    }
     if (source->path.className == "QVXZR_DHCPLease") {
         line += ' ' + text(source, "ElementName");
         if (const cimom::Instance* previous = embedded(indication, "PreviousInstance")) {
@@ -64,13 +67,23 @@ inline std::string brief(const cimom::Instance& indication) {
     return line + ' ' + name.substr(name.rfind('%') + 1);
 }
 
-/// Gets indications and lets a test wait for them.
+/// Gets indications and lets a test wait for them. Those of interfaces, which come with many of
+/// leases and endpoints, are left out unless a test is about them.
 class Told {
   public:
     using Time = std::chrono::steady_clock::time_point;
+    enum class Interfaces { leftOut, alone };
+
+    explicit Told(Interfaces interfaces = Interfaces::leftOut) : interfaces_(interfaces) {}
 
     cimom::IndicationReceiver receiver() {
         return [this](const cimom::Indication& indication) {
+            const cimom::Instance* const source = embedded(indication.instance, "SourceInstance");
+            const bool ofInterface =
+                source != nullptr && source->path.className == "QVXZR_DHCPInterface";
+            if (ofInterface != (interfaces_ == Interfaces::alone)) {
+                return;
+            }
             const std::lock_guard lock(mutex_);
             all_.push_back(indication.instance);
             last_ = std::chrono::steady_clock::now();
@@ -102,6 +115,7 @@ class Told {
     }
 
   private:
+    Interfaces interfaces_;
     std::mutex mutex_;
     std::condition_variable changed_;
     std::vector<cimom::Instance> all_;
