@@ -112,7 +112,7 @@ class ExporterFile {
     }
 
   private:
-    using Json = nlohmann::json;
+    using Document = nlohmann::json;
 
     [[noreturn]] void refuse(const std::string& reason) const {
         throw Failure(ExitStatus::usage, printable(file_) + ": " + printable(reason));
@@ -124,7 +124,7 @@ class ExporterFile {
         Milliseconds timeout{10'000};
     };
 
-    [[nodiscard]] Milliseconds seconds(const Json& value, const std::string& key) const {
+    [[nodiscard]] Milliseconds seconds(const Document& value, const std::string& key) const {
         constexpr double longest = 100;
         const double number = value.get<double>();
         if (!(number > 0 && number <= longest)) {
@@ -134,7 +134,7 @@ class ExporterFile {
     }
 
     /// Whether the key is one of those that stand both for all and for one.
-    bool take(const std::string& key, const Json& value, Said& said) const {
+    bool take(const std::string& key, const Document& value, Said& said) const {
         if (key == "cacert") {
             said.options.caCertificate = value.get<std::string>();
         } else if (key == "credentials") {
@@ -149,7 +149,7 @@ class ExporterFile {
         return true;
     }
 
-    [[nodiscard]] ExporterSettings settingsFrom(const Json& whole) const {
+    [[nodiscard]] ExporterSettings settingsFrom(const Document& whole) const {
         if (!whole.is_object()) {
             refuse("an object with \"targets\" is wanted");
         }
@@ -157,7 +157,7 @@ class ExporterFile {
         settings.offset = Milliseconds(500);
         Said said;
         said.options = options_;
-        const Json* targets = nullptr;
+        const Document* targets = nullptr;
         for (const auto& [key, value] : whole.items()) {
             if (key == "targets" && value.is_array()) {
                 targets = &value;
@@ -170,13 +170,13 @@ class ExporterFile {
         if (targets == nullptr || targets->empty()) {
             refuse("\"targets\" is a list of at least one target");
         }
-        for (const Json& each : *targets) {
+        for (const Document& each : *targets) {
             settings.targets.push_back(targetFrom(each, said));
         }
         return settings;
     }
 
-    [[nodiscard]] std::unique_ptr<ProbeTarget> targetFrom(const Json& entry, Said said) const {
+    [[nodiscard]] std::unique_ptr<ProbeTarget> targetFrom(const Document& entry, Said said) const {
         std::string text;
         if (entry.is_string()) {
             text = entry.get<std::string>();
@@ -300,9 +300,9 @@ class Exporter {
         try {
             url = readServerUrl(*asked);
             // What is the sign of patterns is not a host, nor is what no name can be.
-            constexpr std::size_t longestName = 253;
+            constexpr std::size_t longestHost = 253;
             const bool isName =
-                url.host.size() <= longestName && url.host.find(anyText) == std::string::npos;
+                url.host.size() <= longestHost && url.host.find(anyText) == std::string::npos;
             target = isName ? settings->find(url) : nullptr;
         } catch (const Failure&) {
             // What is not a URL is not a target either; it is not repeated.
