@@ -227,9 +227,7 @@ class Exporter {
     Exporter(ExporterFile file, cimom::wbem::ServerLog log)
         : file_(std::move(file)),
           log_(std::move(log)),
-          settings_(std::make_shared<const ExporterSettings>(file_.read())) {
-        reloadTime_ = secondsNow();
-    }
+          settings_(std::make_shared<const ExporterSettings>(file_.read())) {}
 
     Page page(const PageRequest& request) {
         if (request.path == "/probe") {
@@ -397,7 +395,7 @@ class Exporter {
     std::atomic<std::uint64_t> failed_{0};
     std::atomic<std::uint64_t> refused_{0};
     std::atomic<bool> reloaded_{true};
-    std::atomic<std::int64_t> reloadTime_{0};
+    std::atomic<std::int64_t> reloadTime_{secondsNow()};
 };
 
 /// The signals that the exporter waits for, blocked in all threads that start from now on.
