@@ -356,31 +356,31 @@ class Exporter {
     /// What is told of the exporter itself.
     [[nodiscard]] MetricFamilies own() const {
         const auto number = [](auto value) { return static_cast<double>(value); };
-        using Kind = MetricFamily::Kind;
+        using FamilyKind = MetricFamily::Kind;
         MetricFamilies families;
-        const auto one = [&](const char* name, Kind kind, const char* help, const char* unit,
+        const auto one = [&](const char* name, FamilyKind kind, const char* help, const char* unit,
                              double value) {
             families.push_back({name, kind, help, unit, {{{}, value, ""}}});
         };
         families.push_back(buildInfo("cimdhcp_exporter"));
         families.push_back({"cimdhcp_exporter_probes",
-                            Kind::counter,
+                            FamilyKind::counter,
                             "Probes of machines, by how they ended.",
                             "",
                             {{{{"result", "success"}}, number(succeeded_.load()), ""},
                              {{{"result", "failure"}}, number(failed_.load()), ""}}});
-        one("cimdhcp_exporter_refused_requests", Kind::counter,
+        one("cimdhcp_exporter_refused_requests", FamilyKind::counter,
             "Requests for a target that the configuration does not allow.", "",
             number(refused_.load()));
-        families.push_back({"cimdhcp_exporter_probe_duration_seconds", Kind::histogram,
+        families.push_back({"cimdhcp_exporter_probe_duration_seconds", FamilyKind::histogram,
                             "How long probes took, with the wait for their turn.", "seconds",
                             durations_.samples()});
-        one("cimdhcp_exporter_targets", Kind::gauge,
+        one("cimdhcp_exporter_targets", FamilyKind::gauge,
             "Targets and patterns of targets in the configuration.", "", number(targets()));
-        one("cimdhcp_exporter_config_reload_successful", Kind::gauge,
+        one("cimdhcp_exporter_config_reload_successful", FamilyKind::gauge,
             "Whether the configuration could be read when it was last asked for.", "",
             reloaded_ ? 1 : 0);
-        one("cimdhcp_exporter_config_reload_timestamp_seconds", Kind::gauge,
+        one("cimdhcp_exporter_config_reload_timestamp_seconds", FamilyKind::gauge,
             "When the configuration in use was read.", "seconds", number(reloadTime_.load()));
         families.push_back(cimom::wbem::residentMemory("cimdhcp_exporter"));
         return families;
