@@ -112,7 +112,7 @@ class ExporterFile {
     }
 
   private:
-    using Json = nlohmann::json;
+    using Document = nlohmann::json;
 
     [[noreturn]] void refuse(const std::string& reason) const {
         throw Failure(ExitStatus::usage, printable(file_) + ": " + printable(reason));
@@ -124,7 +124,7 @@ class ExporterFile {
         Milliseconds timeout{10'000};
     };
 
-    [[nodiscard]] Milliseconds seconds(const Json& value, const std::string& key) const {
+    [[nodiscard]] Milliseconds seconds(const Document& value, const std::string& key) const {
         constexpr double longest = 100;
         const double number = value.get<double>();
         if (!(number > 0 && number <= longest)) {
@@ -134,7 +134,7 @@ class ExporterFile {
     }
 
     /// Whether the key is one of those that stand both for all and for one.
-    bool take(const std::string& key, const Json& value, Said& said) const {
+    bool take(const std::string& key, const Document& value, Said& said) const {
         if (key == "cacert") {
             said.options.caCertificate = value.get<std::string>();
         } else if (key == "credentials") {
@@ -149,7 +149,7 @@ class ExporterFile {
         return true;
     }
 
-    [[nodiscard]] ExporterSettings settingsFrom(const Json& whole) const {
+    [[nodiscard]] ExporterSettings settingsFrom(const Document& whole) const {
         if (!whole.is_object()) {
             refuse("an object with \"targets\" is wanted");
         }
@@ -157,7 +157,7 @@ class ExporterFile {
         settings.offset = Milliseconds(500);
         Said said;
         said.options = options_;
-        const Json* targets = nullptr;
+        const Document* targets = nullptr;
         for (const auto& [key, value] : whole.items()) {
             if (key == "targets" && value.is_array()) {
                 targets = &value;
@@ -170,13 +170,13 @@ class ExporterFile {
         if (targets == nullptr || targets->empty()) {
             refuse("\"targets\" is a list of at least one target");
         }
-        for (const Json& each : *targets) {
+        for (const Document& each : *targets) {
             settings.targets.push_back(targetFrom(each, said));
         }
         return settings;
     }
 
-    [[nodiscard]] std::unique_ptr<ProbeTarget> targetFrom(const Json& entry, Said said) const {
+    [[nodiscard]] std::unique_ptr<ProbeTarget> targetFrom(const Document& entry, Said said) const {
         std::string text;
         if (entry.is_string()) {
             text = entry.get<std::string>();
@@ -227,9 +227,7 @@ class Exporter {
     Exporter(ExporterFile file, cimom::wbem::ServerLog log)
         : file_(std::move(file)),
           log_(std::move(log)),
-          settings_(std::make_shared<const ExporterSettings>(file_.read())) {
-        reloadTime_ = secondsNow();
-    }
+          settings_(std::make_shared<const ExporterSettings>(file_.read())) {}
 
     Page page(const PageRequest& request) {
         if (request.path == "/probe") {
@@ -300,9 +298,9 @@ class Exporter {
         try {
             url = readServerUrl(*asked);
             // What is the sign of patterns is not a host, nor is what no name can be.
-            constexpr std::size_t longestName = 253;
+            constexpr std::size_t longestHost = 253;
             const bool isName =
-                url.host.size() <= longestName && url.host.find(anyText) == std::string::npos;
+                url.host.size() <= longestHost && url.host.find(anyText) == std::string::npos;
             target = isName ? settings->find(url) : nullptr;
         } catch (const Failure&) {
             // What is not a URL is not a target either; it is not repeated.
@@ -358,31 +356,31 @@ class Exporter {
     /// What is told of the exporter itself.
     [[nodiscard]] MetricFamilies own() const {
         const auto number = [](auto value) { return static_cast<double>(value); };
-        using Kind = MetricFamily::Kind;
+        using FamilyKind = MetricFamily::Kind;
         MetricFamilies families;
-        const auto one = [&](const char* name, Kind kind, const char* help, const char* unit,
+        const auto one = [&](const char* name, FamilyKind kind, const char* help, const char* unit,
                              double value) {
             families.push_back({name, kind, help, unit, {{{}, value, ""}}});
         };
         families.push_back(buildInfo("cimdhcp_exporter"));
         families.push_back({"cimdhcp_exporter_probes",
-                            Kind::counter,
+                            FamilyKind::counter,
                             "Probes of machines, by how they ended.",
                             "",
                             {{{{"result", "success"}}, number(succeeded_.load()), ""},
                              {{{"result", "failure"}}, number(failed_.load()), ""}}});
-        one("cimdhcp_exporter_refused_requests", Kind::counter,
+        one("cimdhcp_exporter_refused_requests", FamilyKind::counter,
             "Requests for a target that the configuration does not allow.", "",
             number(refused_.load()));
-        families.push_back({"cimdhcp_exporter_probe_duration_seconds", Kind::histogram,
+        families.push_back({"cimdhcp_exporter_probe_duration_seconds", FamilyKind::histogram,
                             "How long probes took, with the wait for their turn.", "seconds",
                             durations_.samples()});
-        one("cimdhcp_exporter_targets", Kind::gauge,
+        one("cimdhcp_exporter_targets", FamilyKind::gauge,
             "Targets and patterns of targets in the configuration.", "", number(targets()));
-        one("cimdhcp_exporter_config_reload_successful", Kind::gauge,
+        one("cimdhcp_exporter_config_reload_successful", FamilyKind::gauge,
             "Whether the configuration could be read when it was last asked for.", "",
             reloaded_ ? 1 : 0);
-        one("cimdhcp_exporter_config_reload_timestamp_seconds", Kind::gauge,
+        one("cimdhcp_exporter_config_reload_timestamp_seconds", FamilyKind::gauge,
             "When the configuration in use was read.", "seconds", number(reloadTime_.load()));
         families.push_back(cimom::wbem::residentMemory("cimdhcp_exporter"));
         return families;
@@ -397,7 +395,7 @@ class Exporter {
     std::atomic<std::uint64_t> failed_{0};
     std::atomic<std::uint64_t> refused_{0};
     std::atomic<bool> reloaded_{true};
-    std::atomic<std::int64_t> reloadTime_{0};
+    std::atomic<std::int64_t> reloadTime_{secondsNow()};
 };
 
 /// The signals that the exporter waits for, blocked in all threads that start from now on.

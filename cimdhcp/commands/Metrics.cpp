@@ -34,8 +34,9 @@ using cimom::wbem::PageRequest;
 namespace http = cimom::wbem::http;
 using Labels = MetricFamily::Labels;
 
-constexpr double yes = 1;
-constexpr double no = 0;
+/// What a sample has for true and for false.
+constexpr double holding = 1;
+constexpr double notHolding = 0;
 
 MetricFamily gaugeFamily(const char* name, const char* help, const char* unit = "") {
     return {name, MetricFamily::Kind::gauge, help, unit, {}};
@@ -88,10 +89,10 @@ class MachineFamilies {
             return;
         }
         if (interface.dhcp) {
-            enabled_.add({{"interface", name}}, *interface.dhcp ? yes : no);
+            enabled_.add({{"interface", name}}, *interface.dhcp ? holding : notHolding);
         }
         if (interface.active) {
-            up_.add({{"interface", name}}, *interface.active ? yes : no);
+            up_.add({{"interface", name}}, *interface.active ? holding : notHolding);
         }
         bool anyLease = false;
         for (const auto& [family, label] : familyLabels) {
@@ -135,7 +136,7 @@ class MachineFamilies {
     void addState(const std::string& name, const char* family, InterfaceState state) {
         for (const StateWord& word : stateWords) {
             state_.add({{"interface", name}, {"family", family}, {"state", stateLabel(word)}},
-                       word.state == state ? yes : no);
+                       word.state == state ? holding : notHolding);
         }
     }
 
@@ -152,7 +153,7 @@ class MachineFamilies {
                    {"family", family},
                    {"client", labelText(lease.client)},
                    {"server", labelText(lease.server)}},
-                  yes);
+                  holding);
     }
 
     const std::int64_t now_;
@@ -189,7 +190,7 @@ class MachineFamilies {
 MetricFamily machineUp(bool up) {
     MetricFamily family =
         gaugeFamily("dhcp_client_up", "Whether the machine could be asked for its DHCP clients.");
-    family.add({}, up ? yes : no);
+    family.add({}, up ? holding : notHolding);
     return family;
 }
 
@@ -266,7 +267,7 @@ MetricFamily buildInfo(const std::string& prefix) {
             MetricFamily::Kind::info,
             "The version of the program that tells this.",
             "",
-            {{{{"version", CIMDHCP_VERSION}}, yes, ""}}};
+            {{{{"version", CIMDHCP_VERSION}}, holding, ""}}};
 }
 
 Page metricsPage(const MetricFamilies& families, const PageRequest& request) {

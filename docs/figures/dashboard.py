@@ -85,7 +85,7 @@ def draw(answers):
         drawing.panel(x, 325, 464 if x == 10 else 466, 125, title)
         for index, each in enumerate(rows[:4]):
             top = 365 + index * ROW
-            drawing.text(x + 20, top, each["metric"][label] or "not known")
+            drawing.text(x + 20, top, each["metric"].get(label, "not known"))
             drawing.text(x + 440, top, f"{number(each):.0f}", anchor="end")
     return drawing.svg(460)
 

@@ -59,6 +59,7 @@ leases() { # leases FILE PROPERTIES: of eth0
 leases good.json '{}'
 leases asking.json '{ClientState: 2, Address: null, ServerAddress: null, LeaseExpires: null}
     | del(..|nulls)'
+# shellcheck disable=SC2016  # jq's own variable
 leases ended.json '{LeaseExpires: ($now - 600), LeaseObtained: ($now - 4200)}'
 leases rogue.json '{ServerAddress: "192.0.2.66"}'
 started() { # started NAME COMMAND...: prints where it listens

@@ -23,22 +23,22 @@ using cimom::wbem::MetricsFormat;
 using cimom::wbem::metricsText;
 using testing::HasSubstr;
 using testing::Not;
-using Kind = MetricFamily::Kind;
+using MetricKind = MetricFamily::Kind;
 
 MetricFamilies ofEachKind() {
     return {{"a_seconds",
-             Kind::gauge,
+             MetricKind::gauge,
              "Back\\slash, \"quotes\" and\nlines.",
              "seconds",
              {{{{"b", "\\ \" \n"}, {"c", ""}}, -0.5, ""}, {{}, 1e300, ""}}},
-            {"d", Kind::counter, "Counted.", "", {{{}, 1234567, ""}}},
-            {"e", Kind::info, "Named.", "", {{{{"version", "1"}}, 1, ""}}},
+            {"d", MetricKind::counter, "Counted.", "", {{{}, 1234567, ""}}},
+            {"e", MetricKind::info, "Named.", "", {{{{"version", "1"}}, 1, ""}}},
             {"f_seconds",
-             Kind::histogram,
+             MetricKind::histogram,
              "Measured.",
              "seconds",
              {{{{"le", "+Inf"}}, 2, "_bucket"}, {{}, 0.25, "_sum"}, {{}, 2, "_count"}}},
-            {"none", Kind::gauge, "Without values.", "", {}}};
+            {"none", MetricKind::gauge, "Without values.", "", {}}};
 }
 
 TEST(Metrics, AreWrittenInTheTextFormat) {
@@ -88,7 +88,7 @@ TEST(Metrics, NumbersThatAreNone) {
     const double infinity = std::numeric_limits<double>::infinity();
     const MetricFamily family{
         "a",
-        Kind::gauge,
+        MetricKind::gauge,
         "A.",
         "",
         {{{}, infinity, ""}, {{}, -infinity, ""}, {{}, std::nan(""), ""}, {{}, 1e15, ""}}};
@@ -149,7 +149,8 @@ TEST(Metrics, AHistogramCountsWhatIsBelowEachBound) {
     for (const double seconds : {0.0005, 0.001, 0.3, 100.0}) {
         histogram.add(std::chrono::duration<double>(seconds));
     }
-    const MetricFamily family{"a_seconds", Kind::histogram, "A.", "seconds", histogram.samples()};
+    const MetricFamily family{"a_seconds", MetricKind::histogram, "A.", "seconds",
+                              histogram.samples()};
     const std::string text = metricsText({family}, MetricsFormat::text);
     EXPECT_THAT(text, HasSubstr("a_seconds_bucket{le=\"0.001\"} 2\n"));
     EXPECT_THAT(text, HasSubstr("a_seconds_bucket{le=\"0.1\"} 2\n"));
@@ -159,9 +160,9 @@ TEST(Metrics, AHistogramCountsWhatIsBelowEachBound) {
                                 "a_seconds_sum 100.3015\na_seconds_count 4\n"));
 }
 
-constexpr std::int64_t now = 2000;
+constexpr std::int64_t lookedAt = 2000;
 
-LeaseOverview lease(const char* family, const char* address) {
+LeaseOverview leaseWith(const char* family, const char* address) {
     LeaseOverview made;
     made.family = family;
     made.address = address;
@@ -185,12 +186,12 @@ InterfaceOverview interfaceWith(std::vector<LeaseOverview> leases) {
     return made;
 }
 
-std::string textOf(const MachineInterfaces& machine) {
-    return metricsText(machineMetrics(machine, now), MetricsFormat::text);
+std::string metricsOf(const MachineInterfaces& machine) {
+    return metricsText(machineMetrics(machine, lookedAt), MetricsFormat::text);
 }
 
 /// Those of the text's lines that begin so.
-std::vector<std::string> linesOf(const std::string& text, const std::string& beginning) {
+std::vector<std::string> metricLines(const std::string& text, const std::string& beginning) {
     std::vector<std::string> found;
     std::istringstream lines(text);
     for (std::string line; std::getline(lines, line);) {
@@ -202,7 +203,7 @@ std::vector<std::string> linesOf(const std::string& text, const std::string& beg
 }
 
 TEST(MachineMetrics, ALeaseHasItsMomentsAndWhoGaveIt) {
-    const std::string text = textOf({{interfaceWith({lease("IPv4", "192.0.2.17")})}, {}});
+    const std::string text = metricsOf({{interfaceWith({leaseWith("IPv4", "192.0.2.17")})}, {}});
     for (const char* line :
          {"dhcp_client_up 1", "dhcp_client_enabled{interface=\"eth0\"} 1",
           "dhcp_client_interface_up{interface=\"eth0\"} 1",
@@ -214,45 +215,47 @@ TEST(MachineMetrics, ALeaseHasItsMomentsAndWhoGaveIt) {
           "server=\"192.0.2.1\"} 1"}) {
         EXPECT_THAT(text, HasSubstr("\n" + std::string(line) + "\n"));
     }
-    EXPECT_EQ(linesOf(text, "dhcp_client_source_errors").size(), 7U);
+    EXPECT_EQ(metricLines(text, "dhcp_client_source_errors").size(), 7U);
 }
 
 TEST(MachineMetrics, OneStateHolds) {
-    EXPECT_EQ(
-        linesOf(textOf({{interfaceWith({lease("IPv4", "192.0.2.17")})}, {}}), "dhcp_client_state{"),
-        (std::vector<std::string>{
-            "dhcp_client_state{interface=\"eth0\",family=\"ipv4\",state=\"off\"} 0",
-            "dhcp_client_state{interface=\"eth0\",family=\"ipv4\",state=\"no_link\"} 0",
-            "dhcp_client_state{interface=\"eth0\",family=\"ipv4\",state=\"asking\"} 0",
-            "dhcp_client_state{interface=\"eth0\",family=\"ipv4\",state=\"bound\"} 1",
-            "dhcp_client_state{interface=\"eth0\",family=\"ipv4\",state=\"renewing\"} 0",
-            "dhcp_client_state{interface=\"eth0\",family=\"ipv4\",state=\"rebinding\"} 0",
-            "dhcp_client_state{interface=\"eth0\",family=\"ipv4\",state=\"expired\"} 0",
-            "dhcp_client_state{interface=\"eth0\",family=\"ipv4\",state=\"unknown\"} 0"}));
+    EXPECT_EQ(metricLines(metricsOf({{interfaceWith({leaseWith("IPv4", "192.0.2.17")})}, {}}),
+                          "dhcp_client_state{"),
+              (std::vector<std::string>{
+                  "dhcp_client_state{interface=\"eth0\",family=\"ipv4\",state=\"off\"} 0",
+                  "dhcp_client_state{interface=\"eth0\",family=\"ipv4\",state=\"no_link\"} 0",
+                  "dhcp_client_state{interface=\"eth0\",family=\"ipv4\",state=\"asking\"} 0",
+                  "dhcp_client_state{interface=\"eth0\",family=\"ipv4\",state=\"bound\"} 1",
+                  "dhcp_client_state{interface=\"eth0\",family=\"ipv4\",state=\"renewing\"} 0",
+                  "dhcp_client_state{interface=\"eth0\",family=\"ipv4\",state=\"rebinding\"} 0",
+                  "dhcp_client_state{interface=\"eth0\",family=\"ipv4\",state=\"expired\"} 0",
+                  "dhcp_client_state{interface=\"eth0\",family=\"ipv4\",state=\"unknown\"} 0"}));
 }
 
 TEST(MachineMetrics, EachAddressFamilyHasItsOwnState) {
-    LeaseOverview asked = lease("IPv6", "");
+    LeaseOverview asked = leaseWith("IPv6", "");
     asked.clientState = static_cast<std::uint64_t>(ZR::NodeLexicon::ClientState::Selecting);
     asked.expires.reset();
-    const std::string text = textOf({{interfaceWith({lease("IPv4", "192.0.2.17"), asked})}, {}});
+    const std::string text =
+        metricsOf({{interfaceWith({leaseWith("IPv4", "192.0.2.17"), asked})}, {}});
     EXPECT_THAT(text, HasSubstr("family=\"ipv4\",state=\"bound\"} 1\n"));
     EXPECT_THAT(text, HasSubstr("family=\"ipv6\",state=\"asking\"} 1\n"));
-    EXPECT_EQ(linesOf(text, "dhcp_client_lease_expires").size(), 1U);
+    EXPECT_EQ(metricLines(text, "dhcp_client_lease_expires").size(), 1U);
 }
 
 TEST(MachineMetrics, OfSeveralLeasesOfAFamilyTheLeadingOneCounts) {
-    LeaseOverview other = lease("IPv4", "198.51.100.1");
+    LeaseOverview other = leaseWith("IPv4", "198.51.100.1");
     other.expires = 9000;
-    const std::string text = textOf({{interfaceWith({other, lease("IPv4", "192.0.2.17")})}, {}});
-    EXPECT_EQ(linesOf(text, "dhcp_client_lease_expires").size(), 1U);
+    const std::string text =
+        metricsOf({{interfaceWith({other, leaseWith("IPv4", "192.0.2.17")})}, {}});
+    EXPECT_EQ(metricLines(text, "dhcp_client_lease_expires").size(), 1U);
     EXPECT_THAT(text, HasSubstr("family=\"ipv4\"} 5000\n"));
 }
 
 TEST(MachineMetrics, ALeaseWithoutAnEndNeverEnds) {
-    LeaseOverview endless = lease("IPv4", "192.0.2.17");
+    LeaseOverview endless = leaseWith("IPv4", "192.0.2.17");
     endless.expires = static_cast<std::int64_t>(ZR::NodeLexicon::never);
-    EXPECT_THAT(textOf({{interfaceWith({endless})}, {}}),
+    EXPECT_THAT(metricsOf({{interfaceWith({endless})}, {}}),
                 HasSubstr("dhcp_client_lease_expires_timestamp_seconds{interface=\"eth0\","
                           "family=\"ipv4\"} +Inf\n"));
 }
@@ -261,25 +264,25 @@ TEST(MachineMetrics, WhatIsNotKnownHasNoValue) {
     InterfaceOverview interface;
     interface.system = hostSystem;
     interface.name = "eth0";
-    const std::string text = textOf({{interface}, {}});
-    EXPECT_EQ(linesOf(text, "dhcp_client_").size(), 9U) << text;  // up, and its state
+    const std::string text = metricsOf({{interface}, {}});
+    EXPECT_EQ(metricLines(text, "dhcp_client_").size(), 9U) << text;  // up, and its state
     EXPECT_THAT(text, HasSubstr("state=\"unknown\"} 1\n"));
     EXPECT_THAT(text, Not(HasSubstr("source_errors")));
 }
 
 TEST(MachineMetrics, ANameThatComesTwiceHasOneValue) {
     // A server may tell what it likes: the same line twice would make the whole text wrong.
-    const std::string text = textOf({{interfaceWith({}), interfaceWith({})}, {}});
-    EXPECT_EQ(linesOf(text, "dhcp_client_enabled").size(), 1U);
+    const std::string text = metricsOf({{interfaceWith({}), interfaceWith({})}, {}});
+    EXPECT_EQ(metricLines(text, "dhcp_client_enabled").size(), 1U);
 }
 
 TEST(MachineMetrics, ErrorsAreCountedByTheirKind) {
     using ZR::Diagnostic;
-    const std::string text = textOf(
+    const std::string text = metricsOf(
         {{interfaceWith({})},
          {Diagnostic("a", Diagnostic::Kind::Denied), Diagnostic("b", Diagnostic::Kind::Denied),
           Diagnostic("c", Diagnostic::Kind::Note)}});
-    EXPECT_THAT(linesOf(text, "dhcp_client_source_errors"),
+    EXPECT_THAT(metricLines(text, "dhcp_client_source_errors"),
                 testing::ElementsAre("dhcp_client_source_errors{kind=\"unreadable\"} 0",
                                      "dhcp_client_source_errors{kind=\"denied\"} 2",
                                      "dhcp_client_source_errors{kind=\"damaged\"} 0",
