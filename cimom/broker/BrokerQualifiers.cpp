@@ -1,8 +1,7 @@
-#include "broker/BrokerQualifiers.h"
+#include "broker/objects/BrokerRecords.h"
 
 #include "broker/Conversion.h"
 #include "broker/RequestScope.h"
-#include "broker/objects/BrokerRecords.h"
 #include "broker/objects/BrokerStatus.h"
 #include "cimom/ClassDeclaration.h"
 #include "cimom/ClassRepository.h"

@@ -4,7 +4,7 @@
 #include <array>
 
 #include "Input.h"
-#include "clients/ProcessStatus.h"
+#include "clients/Processes.h"
 #include "support/Addresses.h"
 
 namespace {

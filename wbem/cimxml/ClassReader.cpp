@@ -1,4 +1,4 @@
-#include "cimxml/ClassReader.h"
+#include "cimxml/ObjectReader.h"
 
 #include <charconv>
 #include <string>
@@ -8,7 +8,6 @@
 #include "cimom/ClassDeclaration.h"
 #include "cimom/Names.h"
 #include "cimxml/Errors.h"
-#include "cimxml/ObjectReader.h"
 
 namespace cimom::wbem {
 

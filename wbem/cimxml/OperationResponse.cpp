@@ -8,7 +8,6 @@
 #include "cimom/Names.h"
 #include "cimxml/Errors.h"
 #include "cimxml/ObjectReader.h"
-#include "cimxml/PathLocation.h"
 
 namespace cimom::wbem {
 

@@ -1,4 +1,4 @@
-#include "cimxml/PathLocation.h"
+#include "cimxml/ObjectReader.h"
 
 #include <memory>
 #include <utility>

@@ -1,6 +1,5 @@
 #include "broker/objects/BrokerRecords.h"
 
-#include "broker/BrokerQualifiers.h"
 #include "broker/BrokerText.h"
 #include "broker/BrokerTypes.h"
 #include "broker/RequestScope.h"

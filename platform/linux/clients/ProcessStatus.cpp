@@ -1,4 +1,4 @@
-#include "clients/ProcessStatus.h"
+#include "clients/Processes.h"
 
 #include <algorithm>
 #include <cstddef>

@@ -22,7 +22,6 @@
 #include "clients/Dhclient.h"
 #include "clients/Dhcp6c.h"
 #include "clients/Dhcpcd.h"
-#include "clients/ProcessStatus.h"
 #include "clients/Udhcpc.h"
 #include "formats/Files.h"
 #include "formats/Trust.h"

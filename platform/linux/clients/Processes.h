@@ -1,9 +1,29 @@
 #pragma once
 
+#include <cstdint>
+#include <optional>
+#include <string_view>
+
 #include "facts/ClientFacts.h"
 #include "formats/Files.h"
 
 namespace ZR::Live {
+
+/// What /proc/PID/status tells of a process (proc(5)).
+struct ProcessStatus {
+    char state = '\0';               ///< 'Z' and 'X': it has ended
+    std::int32_t parent = 0;         ///< process number
+    std::uint32_t realUser{};        ///< who started it
+    std::uint32_t user{};            ///< effective
+    std::uint64_t capabilities = 0;  ///< effective ones, in its own user namespace
+
+    [[nodiscard]] bool hasEnded() const noexcept { return state == 'Z' || state == 'X'; }
+
+    bool operator==(const ProcessStatus&) const = default;
+};
+
+/// nullopt where the state or the users are missing.
+[[nodiscard]] std::optional<ProcessStatus> parseProcessStatus(std::string_view text);
 
 /// Adds the running DHCP clients, and the programs that manage links. Clients of another
 /// network namespace concern other links, possibly of the same names, and are left out.

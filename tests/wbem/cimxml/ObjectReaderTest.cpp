@@ -6,11 +6,9 @@
 #include "cimom/ClassRepository.h"
 #include "cimom/Instance.h"
 #include "cimom/ObjectPathText.h"
-#include "cimxml/ClassReader.h"
 #include "cimxml/Errors.h"
 #include "cimxml/ObjectReader.h"
 #include "cimxml/ObjectWriter.h"
-#include "cimxml/PathLocation.h"
 
 namespace cimom::wbem {
 

@@ -8,8 +8,8 @@
 #include "cimom/ClassDeclaration.h"
 #include "cimom/ClassRepository.h"
 #include "cimxml/Call.h"
-#include "cimxml/ClassReader.h"
 #include "cimxml/Errors.h"
+#include "cimxml/ObjectReader.h"
 #include "cimxml/ObjectWriter.h"
 #include "kit/RandomObjects.h"
 

@@ -7,8 +7,8 @@
 #include "cimom/ClassRepository.h"
 #include "cimom/Names.h"
 #include "cimom/Results.h"
+#include "cimxml/ObjectReader.h"
 #include "cimxml/ObjectWriter.h"
-#include "cimxml/PathLocation.h"
 #include "operations/Modification.h"
 #include "operations/Request.h"
 

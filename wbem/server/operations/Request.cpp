@@ -6,8 +6,8 @@
 #include "cimom/ClassRepository.h"
 #include "cimom/Instance.h"
 #include "cimom/Names.h"
+#include "cimxml/ObjectReader.h"
 #include "cimxml/ObjectWriter.h"
-#include "cimxml/PathLocation.h"
 
 namespace cimom::wbem {
 

@@ -17,7 +17,6 @@
 #include <sstream>
 
 #include "LinuxSupport.h"
-#include "clients/ProcessStatus.h"
 #include "kit/ChildProcess.h"
 #include "kit/Diagnostics.h"
 #include "kit/Namespaces.h"

@@ -45,4 +45,17 @@ void expectNoText(const XmlElement& element);
 /// VALUE.ARRAY of texts, none of which may be null.
 [[nodiscard]] std::vector<std::string> readTexts(const XmlElement& element);
 
+/// Reads CLASS. Methods are passed over, as are the default values of embedded
+/// instances. Inherited properties and qualifiers are there when the server was asked
+/// for them. Throws NotValid for a wrong structure and CimError for a value that is
+/// none of its type.
+[[nodiscard]] ClassDeclaration readClass(const XmlElement& element);
+
+/// Puts the namespace where a path names none: DSP0201 lets INSTANCENAME stand for an
+/// object of the operation's own namespace. A reference in the keys that names none is
+/// of the namespace of the path around it.
+void locate(ObjectPath& path, const std::string& nameSpace);
+/// The same for an instance: its path, and the references in its properties.
+void locate(Instance& instance, const std::string& nameSpace);
+
 }  // namespace cimom::wbem

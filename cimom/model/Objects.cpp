@@ -2,9 +2,14 @@
 
 #include <algorithm>
 
+#include "cimom/Instance.h"
 #include "cimom/Names.h"
 
 namespace cimom {
+
+const Value* Instance::property(std::string_view name) const noexcept {
+    return findValue(properties, name);
+}
 
 const Value* ObjectPath::key(std::string_view name) const noexcept {
     return findValue(keys, name);
