@@ -2,6 +2,8 @@
 
 #include <array>
 #include <cstddef>
+#include <cstdint>
+#include <cstring>
 
 #include "cimom/Utf8.h"
 
@@ -55,15 +57,36 @@ std::string_view referenceTo(char character) noexcept {
     }
 }
 
+/// Whether the next eight bytes have none of the specials: of letters, digits and the like nearly
+/// all texts consist. False also for some that have none.
+bool areEightPlain(const char* bytes) noexcept {
+    constexpr std::uint64_t ones = 0x0101010101010101;
+    constexpr std::uint64_t highs = 0x80 * ones;
+    std::uint64_t word = 0;
+    std::memcpy(&word, bytes, sizeof word);
+    // Sets the high bit of each byte that is 0, and perhaps of others behind it.
+    const auto zeros = [](std::uint64_t value) { return (value - ones) & ~value; };
+    const std::uint64_t below = (word - 0x20 * ones) | word;
+    // "<" and ">" differ in one bit, and likewise '"' and "&".
+    const std::uint64_t brackets = zeros((word | 0x02 * ones) ^ ('>' * ones));
+    const std::uint64_t others = zeros((word | 0x04 * ones) ^ ('&' * ones));
+    return ((below | brackets | others) & highs) == 0;
+}
+
 void append(std::string& out, std::string_view text, const Specials& specials) {
     std::size_t plain = 0;  // where the part begins that is not copied yet
     std::size_t at = 0;
     while (at < text.size()) {
-        const auto byte = static_cast<unsigned char>(text[at]);
-        if (!specials[byte]) {
-            ++at;
-            continue;
+        while (text.size() - at >= sizeof(std::uint64_t) && areEightPlain(text.data() + at)) {
+            at += sizeof(std::uint64_t);
         }
+        while (at < text.size() && !specials[static_cast<unsigned char>(text[at])]) {
+            ++at;
+        }
+        if (at == text.size()) {
+            break;
+        }
+        const auto byte = static_cast<unsigned char>(text[at]);
         std::size_t length = 1;
         std::string_view written;
         if (byte < 0x80) {

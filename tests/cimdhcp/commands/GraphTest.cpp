@@ -69,7 +69,7 @@ TEST(Graph, ManyInstancesFindTheirOwn) {
     std::vector<ObjectPath> elements;
     std::vector<ObjectPath> associations;
     std::vector<GraphEdge> edges;
-    constexpr std::size_t count = 10'000;
+    constexpr std::size_t count = 2'000;
     for (std::size_t i = 0; i < count; ++i) {
         const std::string name = "eth" + std::to_string(i);
         elements.push_back(endpoint(name));
