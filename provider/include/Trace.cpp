@@ -105,13 +105,12 @@ struct Buffer {
     }
 };
 
-/// Those of one thread, and how often any of them was filled.
+/// Those of one thread.
 struct Buffers {
     Buffer textVariable;
     Buffer numberVariable;
     Buffer plain;
     Buffer withParameters;
-    unsigned formattings;
 };
 
 /// In a shared library the address of a thread's variable takes a call, and the compiler makes
@@ -124,13 +123,6 @@ struct Buffers {
 Buffers&
 buffersOfThread() {
     static thread_local Buffers buffers{};
-    return buffers;
-}
-
-/// The buffers for a formatting, which is counted.
-Buffers& toBeFilled() {
-    Buffers& buffers = buffersOfThread();
-    ++buffers.formattings;
     return buffers;
 }
 
@@ -193,25 +185,21 @@ constexpr const char* markFile = "include/Trace";
 
 namespace TraceText {
 
-const unsigned& formattings() noexcept {
-    return buffersOfThread().formattings;
-}
-
 std::string_view variable(std::string_view name, std::string_view file, unsigned line,
                           std::string_view value) {
-    return formatAll<textVariable>(toBeFilled().textVariable, Argument(name), Argument(value),
+    return formatAll<textVariable>(buffersOfThread().textVariable, Argument(name), Argument(value),
                                    Argument(line), Argument(file));
 }
 
 std::string_view variable(std::string_view name, std::string_view file, unsigned line,
                           unsigned value) {
-    return formatAll<numberVariable>(toBeFilled().numberVariable, Argument(name), Argument(value),
+    return formatAll<numberVariable>(buffersOfThread().numberVariable, Argument(name), Argument(value),
                                      Argument(line), Argument(file));
 }
 
 std::string_view plain(std::string_view file, std::string_view function, unsigned line,
                        MessageType type) {
-    Buffer& buffer = toBeFilled().plain;
+    Buffer& buffer = buffersOfThread().plain;
     const Argument where(file);
     const Argument what(function);
     const Argument at(line);
@@ -231,7 +219,7 @@ std::string_view plain(std::string_view file, std::string_view function, unsigne
 
 std::string_view withParameters(std::string_view file, std::string_view function, unsigned line,
                                 std::string_view parameters, MessageType type) {
-    Buffer& buffer = toBeFilled().withParameters;
+    Buffer& buffer = buffersOfThread().withParameters;
     const Argument where(file);
     const Argument what(function);
     const Argument at(line);

@@ -50,10 +50,6 @@ inline std::string_view of(const char* text) {
     return text == nullptr ? "(null)" : text;
 }
 
-/// How many texts this thread has formatted so far: as long as the number stays as it is, the
-/// buffers stay, too. Valid as long as the thread is.
-const unsigned& formattings() noexcept;
-
 std::string_view variable(std::string_view name, std::string_view file, unsigned line,
                           std::string_view value);
 std::string_view variable(std::string_view name, std::string_view file, unsigned line,

@@ -54,24 +54,18 @@ struct RowSource {
     [[nodiscard]] TracePoint destructor() const { return at(destructorName); }
 };
 
-/// Hands a line to both channels of the logging service, log and trace. The first may have traced
-/// on its own; the text is then formatted anew for the second. Else the buffer has it still.
+/// Hands a line to both channels of the logging service, log and trace. The text is formatted anew
+/// for the second, since the first may have traced on its own.
 template <typename Text>
 void writeLine(const TracePoint& at, int level, const Text& text) {
-    const unsigned& formattings = TraceText::formattings();
-    std::string_view formatted = text();
-    const unsigned before = formattings;
     {
         TKLog::TKMessageBuffer line;
-        line << formatted;
+        line << text();
         TKLog::TKLogger::logLevelMessage(at.source.file.data(), at.function.data(), at.line,
                                          at.source.logger, level, nullptr, 0, 0, line.str());
     }
-    if (formattings != before) {
-        formatted = text();
-    }
     TKLog::TKLogger::traceLevelMessage(at.source.file.data(), at.function.data(), at.line,
-                                       at.source.logger, level, nullptr, 0, 0, formatted);
+                                       at.source.logger, level, nullptr, 0, 0, text());
 }
 
 /// VARIABLE lines.

@@ -62,19 +62,6 @@ TEST(TracePoint, LineCarriesThePlaceOfItsPoint) {
                          "atOnePoint", "METHOD: atOnePoint() was invoked" + place(records[0])}));
 }
 
-TEST(TracePoint, LineIsFormattedOnceForBothWhereNothingComesBetween) {
-    const LogCapture capture;
-    int formattings = 0;
-    writeLine(ZR_HERE, flowLevel, [&] {
-        ++formattings;
-        return TraceText::plain("Some/File", "function", 7, entering);
-    });
-    EXPECT_EQ(formattings, 1);
-    const auto records = sameOnBothRoads(capture);
-    ASSERT_EQ(records.size(), 1U);
-    EXPECT_EQ(records[0].message, "ENTERING: function() in Some/File [Line: 7]");
-}
-
 TEST(TracePoint, VariablesOfEveryKind) {
     const LogCapture capture;
     const TracePoint at{source, "g", 5};

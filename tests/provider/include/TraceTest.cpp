@@ -147,18 +147,6 @@ TEST(Trace, TextIsValidUntilTheNextCallOfTheSameHelper) {
     EXPECT_EQ(tracepara("f", "g", 2, "second", exiting), withParameters);
 }
 
-TEST(Trace, EachFormattingIsCountedForItsThread) {
-    const unsigned& formattings = TraceText::formattings();
-    const unsigned before = formattings;
-    std::thread([] { static_cast<void>(trace("file", "function", 1, entering)); }).join();
-    EXPECT_EQ(formattings, before);
-    static_cast<void>(trace("name", "file", 1, "value"));
-    static_cast<void>(trace("name", "file", 1, 7U));
-    static_cast<void>(trace("file", "function", 1, entering));
-    static_cast<void>(tracepara("file", "function", 1, "parameters", exiting));
-    EXPECT_EQ(formattings, before + 4);
-}
-
 TEST(Trace, OtherThreadsDoNotDisturbATextOfThisOne) {
     const char* const text = trace("v", "f", 1, "mine");
     const char* const number = trace("v", "f", 1, 1U);
