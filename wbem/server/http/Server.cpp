@@ -169,7 +169,7 @@ class Server::Implementation {
                          MHD_USE_NO_LISTEN_SOCKET | MHD_USE_ERROR_LOG;
         if (settings_.tls) {
             flags |= MHD_USE_TLS;
-            TlsSessions::addOptions(options);
+            tls_->addOptions(options);
         }
         options.push_back({MHD_OPTION_END, 0, nullptr});
         daemon_.reset(MHD_start_daemon(flags, 0, nullptr, nullptr, &handleRequest, this,
