@@ -40,6 +40,14 @@ constexpr std::size_t shortBody = 65536;
 /// How long clients have to take their last responses when the server ends.
 constexpr std::chrono::seconds farewell{2};
 
+/// Sees to it that what long requests had goes back at once: by itself, the allocator would keep
+/// ever larger blocks for the next ones, in pieces between what lasts.
+void giveLongBlocksBack() {
+    constexpr int longBlock = 131072;
+    // Cannot fail: the value is one of those that are allowed.
+    static_cast<void>(::mallopt(M_MMAP_THRESHOLD, longBlock));
+}
+
 /// Sees to it that the process may have a descriptor for each connection and its response.
 /// Throws ServerError.
 void provideDescriptors(const Limits& limits) {
@@ -74,6 +82,7 @@ class Server::Implementation {
           connections_(settings_.limits, shares_),
           dispatcher_(manager, settings_, log_, shares_) {
         provideDescriptors(settings_.limits);
+        giveLongBlocksBack();
         if (settings_.tls) {
             tls_.emplace(*settings_.tls,
                          [this](const std::string& line) { log_(LogKind::failure, line); });
@@ -391,10 +400,13 @@ class Server::Implementation {
 
     /// Memory is taken for what arrives, not for what is announced. False when there is none.
     [[nodiscard]] bool makeRoom(Exchange& exchange, std::size_t size) const {
-        const std::size_t most = exchange.headers->contentLength.value_or(settings_.limits.body);
+        const auto length = exchange.headers->contentLength;
         if (size > exchange.body.capacity()) {
-            const std::size_t capacity =
-                std::max(size, std::min(2 * exchange.body.capacity(), most));
+            // A long one is not copied again and again, which would leave holes in the memory.
+            const std::size_t most = length.value_or(settings_.limits.body);
+            const std::size_t wanted =
+                length && size > shortBody ? *length : std::min(2 * exchange.body.capacity(), most);
+            const std::size_t capacity = std::max(size, wanted);
             // While it grows, there are two of it.
             if (!exchange.memory.growTo(capacity + exchange.body.capacity())) {
                 return false;
@@ -410,7 +422,13 @@ class Server::Implementation {
         if (!exchange->isHeadChecked) {
             exchange->isHeadChecked = true;
             if (exchange->handedOver()) {
-                return refuseBody(connection, *exchange, responseOf(*exchange));
+                HttpResponse response = responseOf(*exchange);
+                if (response.status == http::serviceUnavailable) {
+                    // Its address guesses too fast; a new connection takes it longer.
+                    response.close = true;
+                    return send(connection, *exchange, std::move(response));
+                }
+                return refuseBody(connection, *exchange, std::move(response));
             }
             return expectBody(connection, *exchange);
         }
