@@ -38,6 +38,7 @@ dpkg --install *.deb >/dev/null
 test -x /usr/bin/cimdhcp
 command -v cimdhcp
 grep -x 'ExecStart=/usr/bin/cimdhcp serve --read-only' /usr/lib/systemd/system/cimdhcp.service
+grep -Fx 'ExecReload=/bin/kill -HUP $MAINPID' /usr/lib/systemd/system/cimdhcp.service
 for page in man1/cimdhcp.1 man5/zr-platform.conf.5 man8/provider-register.sh.8; do
     test -s /usr/share/man/$page.gz
 done
