@@ -329,7 +329,7 @@ def main():
     given = options.parse_args()
     _, most = resource.getrlimit(resource.RLIMIT_NOFILE)
     resource.setrlimit(resource.RLIMIT_NOFILE, (min(SOCKETS, most), most))
-    seconds = 0.4 if given.short else 20
+    seconds = 0.4 if given.short else 10
     ok = True
     attacks = [attack for attack in ATTACKS if given.only in attack.name]
     with tempfile.TemporaryDirectory() as directory:

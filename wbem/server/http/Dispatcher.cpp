@@ -65,12 +65,14 @@ void Dispatcher::authenticate(const SharedExchange& exchange) {
         exchange->finish(HttpResponse::failure(http::serviceUnavailable));
         return;
     }
-    const auto turn = std::make_shared<Turn>(shares_, exchange->key());
+    auto turn = std::make_shared<Turn>(shares_, exchange->key());
     // Checking a password is slow, on purpose: one at a time, so that wrong ones leave the
     // workers to those who have been admitted. Each in the queue has a task of the gate, which
     // takes not that one, but the one whose turn it is.
     if (checks_.push(exchange->key(), shares_.isKnown(exchange->key()),
-                     [this, exchange, turn] { checkPassword(exchange, turn); })) {
+                     [this, exchange, turn = std::move(turn)]() mutable {
+                         checkPassword(exchange, std::move(turn));
+                     })) {
         runOrRefuse(gate_, exchange, [this] { checks_.pop()(); });
     } else {
         log_(LogKind::request, exchange->address() + ": too many passwords are checked");
@@ -78,16 +80,18 @@ void Dispatcher::authenticate(const SharedExchange& exchange) {
     }
 }
 
-void Dispatcher::checkPassword(const SharedExchange& exchange, const std::shared_ptr<Turn>& turn) {
+void Dispatcher::checkPassword(const SharedExchange& exchange, std::shared_ptr<Turn> turn) {
     if (exchange->isFinished()) {
         return;
     }
     try {
         if (auto identity = authenticator_->check(*exchange->headers->authorization)) {
             shares_.admitted(exchange->key());
+            // Before the client can send the next one, which may need the turn.
+            turn.reset();
             exchange->giveBack(*std::move(identity));
         } else {
-            refuse(exchange, turn);
+            refuse(exchange, std::move(turn));
         }
     } catch (const std::exception& error) {
         log_(LogKind::failure, error.what());
@@ -95,15 +99,17 @@ void Dispatcher::checkPassword(const SharedExchange& exchange, const std::shared
     }
 }
 
-void Dispatcher::refuse(const SharedExchange& exchange, const std::shared_ptr<Turn>& turn) {
+void Dispatcher::refuse(const SharedExchange& exchange, std::shared_ptr<Turn> turn) {
     shares_.refused(exchange->key());
     counts_.credentialsRefused();
     log_(LogKind::refusal, "refused " +
                                authenticator_->claimedUser(*exchange->headers->authorization) +
                                " from " + exchange->address() + ", refusal number " +
                                std::to_string(authenticator_->countRefusal()));
-    if (!timers_.runAfter(settings_.refusalDelay,
-                          [exchange, turn] { exchange->finish(HttpResponse::refusal()); })) {
+    if (!timers_.runAfter(settings_.refusalDelay, [exchange, turn = std::move(turn)]() mutable {
+            turn.reset();
+            exchange->finish(HttpResponse::refusal());
+        })) {
         exchange->finish(HttpResponse::failure(http::serviceUnavailable));
     }
 }

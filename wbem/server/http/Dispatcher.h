@@ -50,9 +50,9 @@ class Dispatcher {
   private:
     /// What one check has of its address, until the client has its response.
     class Turn;
-    void checkPassword(const SharedExchange& exchange, const std::shared_ptr<Turn>& turn);
+    void checkPassword(const SharedExchange& exchange, std::shared_ptr<Turn> turn);
     /// Responds, after a while, that the credentials are wrong, and logs whose.
-    void refuse(const SharedExchange& exchange, const std::shared_ptr<Turn>& turn);
+    void refuse(const SharedExchange& exchange, std::shared_ptr<Turn> turn);
     void runOrRefuse(TaskPool& pool, const SharedExchange& exchange, TaskPool::Task task);
     [[nodiscard]] HttpResponse carryOut(Exchange& exchange, Caller caller);
     /// Carries a request out, in a worker.

@@ -1,5 +1,7 @@
 #include "http/GzipStream.h"
 
+// What is compressed is constant to zlib only if it is told so.
+#define ZLIB_CONST
 #include <zlib.h>
 
 #include <array>
@@ -65,8 +67,7 @@ std::unique_ptr<GzipStream> GzipStream::begin() {
 
 void GzipStream::add(std::string_view piece, bool last, std::string& out) {
     z_stream& stream = state_->stream;
-    // zlib takes constant bytes by a pointer to plain ones.
-    stream.next_in = reinterpret_cast<Bytef*>(const_cast<char*>(piece.data()));
+    stream.next_in = reinterpret_cast<const Bytef*>(piece.data());
     stream.avail_in = static_cast<uInt>(piece.size());
     std::array<char, 16384> made;  // NOLINT(cppcoreguidelines-pro-type-member-init): written first
     do {

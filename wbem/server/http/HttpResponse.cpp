@@ -78,7 +78,7 @@ struct Destroyed {
 using MhdResponse = std::unique_ptr<MHD_Response, Destroyed>;
 
 /// What the head of a request says about the form of its response.
-struct Form {
+struct WantedForm {
     std::vector<std::string> transfer;
     std::vector<std::string> content;
 
@@ -89,7 +89,7 @@ struct Form {
 };
 
 MHD_Result addForm(void* self, MHD_ValueKind /*kind*/, const char* name, const char* value) {
-    auto& form = *static_cast<Form*>(self);
+    auto& form = *static_cast<WantedForm*>(self);
     if (name != nullptr && value != nullptr) {
         if (sameName(name, "TE")) {
             form.transfer.emplace_back(value);
@@ -172,7 +172,7 @@ MHD_Result sendResponse(MHD_Connection* connection, HttpResponse response, bool 
                         std::chrono::microseconds serverTime) {
     const bool isCim = response.body.has_value();
     const bool close = response.close;
-    Form form;
+    WantedForm form;
     MHD_get_connection_values(connection, MHD_HEADER_KIND, addForm, &form);
     auto gzip = form.compressed() && response.begun.size() >= leastCompressed ? GzipStream::begin()
                                                                               : nullptr;

@@ -55,6 +55,14 @@ PageArguments argumentsOf(MHD_Connection* connection) {
     return arguments;
 }
 
+/// Sees to it that what long requests had goes back at once: by itself, the allocator would keep
+/// ever larger blocks for the next ones, in pieces between what lasts.
+void giveLongBlocksBack() {
+    constexpr int longBlock = 131072;
+    // Cannot fail: the value is one of those that are allowed.
+    static_cast<void>(::mallopt(M_MMAP_THRESHOLD, longBlock));
+}
+
 /// Sees to it that the process may have a descriptor for each connection and its response.
 /// Throws ServerError.
 void provideDescriptors(const Limits& limits) {
@@ -91,6 +99,7 @@ class Server::Implementation {
           connections_(settings_.limits, shares_),
           dispatcher_(manager, pages_, settings_, log_, shares_, counts_) {
         provideDescriptors(settings_.limits);
+        giveLongBlocksBack();
         if (settings_.tls) {
             tls_.emplace(*settings_.tls,
                          [this](const std::string& line) { log_(LogKind::failure, line); });
@@ -187,7 +196,7 @@ class Server::Implementation {
                          MHD_USE_NO_LISTEN_SOCKET | MHD_USE_ERROR_LOG;
         if (settings_.tls) {
             flags |= MHD_USE_TLS;
-            TlsSessions::addOptions(options);
+            tls_->addOptions(options);
         }
         options.push_back({MHD_OPTION_END, 0, nullptr});
         daemon_.reset(MHD_start_daemon(flags, 0, nullptr, nullptr, &handleRequest, this,
@@ -420,10 +429,13 @@ class Server::Implementation {
 
     /// Memory is taken for what arrives, not for what is announced. False when there is none.
     [[nodiscard]] bool makeRoom(Exchange& exchange, std::size_t size) const {
-        const std::size_t most = exchange.headers->contentLength.value_or(settings_.limits.body);
+        const auto length = exchange.headers->contentLength;
         if (size > exchange.body.capacity()) {
-            const std::size_t capacity =
-                std::max(size, std::min(2 * exchange.body.capacity(), most));
+            // A long one is not copied again and again, which would leave holes in the memory.
+            const std::size_t most = length.value_or(settings_.limits.body);
+            const std::size_t wanted =
+                length && size > shortBody ? *length : std::min(2 * exchange.body.capacity(), most);
+            const std::size_t capacity = std::max(size, wanted);
             // While it grows, there are two of it.
             if (!exchange.memory.growTo(capacity + exchange.body.capacity())) {
                 return false;
@@ -439,7 +451,13 @@ class Server::Implementation {
         if (!exchange->isHeadChecked) {
             exchange->isHeadChecked = true;
             if (exchange->handedOver()) {
-                return refuseBody(connection, *exchange, responseOf(*exchange));
+                HttpResponse response = responseOf(*exchange);
+                if (response.status == http::serviceUnavailable) {
+                    // Its address guesses too fast; a new connection takes it longer.
+                    response.close = true;
+                    return send(connection, *exchange, std::move(response));
+                }
+                return refuseBody(connection, *exchange, std::move(response));
             }
             return expectBody(connection, *exchange);
         }

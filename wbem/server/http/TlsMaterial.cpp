@@ -18,10 +18,9 @@ constexpr int ticketLifetime = 3600;
     throw ServerError(what + ": " + gnutls_strerror(error));
 }
 
-gnutls_datum_t datumOf(const std::string& text) {
-    // GnuTLS takes constant bytes by a pointer to plain ones, too.
-    return {reinterpret_cast<unsigned char*>(const_cast<char*>(text.data())),
-            static_cast<unsigned>(text.size())};
+/// GnuTLS takes bytes that it only reads by a pointer to plain ones, too.
+gnutls_datum_t datumOf(std::string& text) {
+    return {reinterpret_cast<unsigned char*>(text.data()), static_cast<unsigned>(text.size())};
 }
 
 using KeyId = std::array<unsigned char, 32>;
@@ -100,7 +99,7 @@ gnutls_session_t sessionOf(MHD_Connection* connection) {
 
 class TlsMaterial::Key {
   public:
-    explicit Key(const std::string& text) {
+    explicit Key(std::string text) {
         gnutls_x509_privkey_t plain = nullptr;
         if (const int error = gnutls_x509_privkey_init(&plain); error < 0) {
             failTls("TLS key", error);
@@ -140,7 +139,7 @@ class TlsMaterial::Key {
 /// The certificates of a PEM text, sorted: that of the server first.
 class TlsMaterial::Certificates {
   public:
-    explicit Certificates(const std::string& text) {
+    explicit Certificates(std::string text) {
         const gnutls_datum_t data = datumOf(text);
         const int error = gnutls_x509_crt_list_import2(&list_, &size_, &data, GNUTLS_X509_FMT_PEM,
                                                        GNUTLS_X509_CRT_LIST_SORT);
@@ -278,8 +277,8 @@ TlsSessions::TlsSessions(const ServerSettings::Tls& texts,
                          std::function<void(const std::string&)> tell)
     : tell_(std::move(tell)), current_(made(texts)) {}
 
-std::shared_ptr<const TlsMaterial> TlsSessions::made(const ServerSettings::Tls& texts) const {
-    auto material = std::make_shared<const TlsMaterial>(texts);
+std::shared_ptr<TlsMaterial> TlsSessions::made(const ServerSettings::Tls& texts) const {
+    auto material = std::make_shared<TlsMaterial>(texts);
     for (const std::string& warning : material->warnings(std::time(nullptr))) {
         tell_(warning);
     }
@@ -296,11 +295,11 @@ void TlsSessions::addOptions(std::vector<MHD_OptionItem>& options) {
     options.push_back({MHD_OPTION_HTTPS_CERT_CALLBACK, 0,
                        reinterpret_cast<void*>(
                            static_cast<gnutls_certificate_retrieve_function2*>(&lendMaterial))});
-    options.push_back({MHD_OPTION_HTTPS_PRIORITIES, 0, const_cast<char*>(tlsPriorities)});
+    options.push_back({MHD_OPTION_HTTPS_PRIORITIES, 0, priorities_.data()});
 }
 
 void TlsSessions::opened(MHD_Connection* connection) {
-    const gnutls_session_t session = sessionOf(connection);
+    gnutls_session_t session = sessionOf(connection);
     if (session == nullptr) {
         return;
     }
@@ -308,7 +307,7 @@ void TlsSessions::opened(MHD_Connection* connection) {
     used_.insert_or_assign(connection, current_);
     // The pointer is free for this: sessions are kept by the clients, in tickets, and not in
     // a data base of the server.
-    gnutls_db_set_ptr(session, const_cast<TlsMaterial*>(current_.get()));
+    gnutls_db_set_ptr(session, current_.get());
     current_->enableTickets(session);
 }
 

@@ -69,17 +69,18 @@ class TlsSessions {
     void renew(const ServerSettings::Tls& texts);
 
     /// Adds the options of a server that uses this, which has to outlive the server.
-    static void addOptions(std::vector<MHD_OptionItem>& options);
+    void addOptions(std::vector<MHD_OptionItem>& options);
     /// For each connection, before its handshake and at its end.
     void opened(MHD_Connection* connection);
     void closed(MHD_Connection* connection);
 
   private:
-    [[nodiscard]] std::shared_ptr<const TlsMaterial> made(const ServerSettings::Tls& texts) const;
+    [[nodiscard]] std::shared_ptr<TlsMaterial> made(const ServerSettings::Tls& texts) const;
 
     const std::function<void(const std::string&)> tell_;
+    std::string priorities_ = tlsPriorities;  ///< as the library takes it, not constant
     std::mutex mutex_;
-    std::shared_ptr<const TlsMaterial> current_;
+    std::shared_ptr<TlsMaterial> current_;
     /// What each connection may still read from.
     std::unordered_map<MHD_Connection*, std::shared_ptr<const TlsMaterial>> used_;
 };

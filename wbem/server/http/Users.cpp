@@ -257,12 +257,12 @@ std::vector<User> readUsers(const std::filesystem::path& file) {
     return users;
 }
 
-void putUser(const std::filesystem::path& name, const User& user) {
-    const std::filesystem::path file = targetOf(name);
-    const auto lock = lockUsers(file);
+void putUser(const std::filesystem::path& file, const User& user) {
+    const std::filesystem::path target = targetOf(file);
+    const auto lock = lockUsers(target);
     std::string text = "# NAME:ROLE:HASH, made by \"cimdhcp user add\"\n";
     // Hashes of any kind: with this call a weak one gets replaced.
-    std::vector<User> users = parse(contentOf(file), file, Hashes::any);
+    std::vector<User> users = parse(contentOf(target), target, Hashes::any);
     const auto known = std::find_if(users.begin(), users.end(),
                                     [&user](const User& other) { return other.name == user.name; });
     if (known == users.end()) {
@@ -273,13 +273,13 @@ void putUser(const std::filesystem::path& name, const User& user) {
     for (const User& each : users) {
         text += each.name + ':' + std::string(roleName(each.role)) + ':' + each.hash + '\n';
     }
-    Replacement replacement(file);
+    Replacement replacement(target);
     replacement.write(text);
-    const struct ::stat status = statusOf(file);
+    const struct ::stat status = statusOf(target);
     const ::mode_t mode = status.st_mode & (S_IRUSR | S_IWUSR | S_IRGRP);
     if (::fchown(replacement.fd(), status.st_uid, status.st_gid) != 0 ||
         ::fchmod(replacement.fd(), mode) != 0) {
-        failErrno(file);
+        failErrno(target);
     }
     replacement.take();
 }
