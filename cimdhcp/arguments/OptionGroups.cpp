@@ -38,7 +38,7 @@ void addLimits(CLI::App& app, cimom::wbem::Limits& limits) {
     number("--max-connections-each", limits.connectionsEach,
            "Of these, of an address that has not shown a right password (128)");
     number("--max-connection-rate", limits.connectionRate,
-           "New connections of such an address in a second (100)");
+           "New ones of such an address in a second, once it has had so many (20)");
     number("--max-checks-each", limits.checksEach,
            "Passwords of an address that are checked at the same time (8)");
     number("--max-refusals-each", limits.refusalsEach,

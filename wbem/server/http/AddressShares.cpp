@@ -38,7 +38,7 @@ AddressShares::AddressShares(const Limits& limits, std::function<Clock::time_poi
       checksEach_(limits.checksEach),
       memory_(limits.memory),
       connectionInterval_(Clock::duration(std::chrono::seconds(1)) / limits.connectionRate),
-      connectionBurst_(std::chrono::seconds(1)),
+      connectionBurst_(connectionInterval_ * limits.connectionsEach + std::chrono::seconds(1)),
       refusalInterval_(Clock::duration(std::chrono::minutes(1)) / limits.refusalsEach),
       refusalBurst_(std::chrono::minutes(1)),
       now_(std::move(now)) {}

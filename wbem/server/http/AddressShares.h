@@ -38,7 +38,8 @@ class AddressShares {
     [[nodiscard]] bool isKnown(const AddressKey& key) const;
 
     /// Whether the address may have one more connection; counts it then. Looks at its own share
-    /// alone, not at the whole.
+    /// alone, not at the whole. An address that is not known may open its share at once, and
+    /// then so many in a second: each costs a TLS handshake.
     [[nodiscard]] bool addConnection(const AddressKey& key);
     void removeConnection(const AddressKey& key);
     [[nodiscard]] std::size_t connections(const AddressKey& key) const;

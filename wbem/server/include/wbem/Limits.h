@@ -24,7 +24,7 @@ struct Limits {
     std::size_t depth = 64;              ///< of XML elements
     std::size_t connections = 512;       ///< at the same time
     std::size_t connectionsEach = 128;   ///< of these, of an address that is not known
-    std::size_t connectionRate = 100;    ///< new ones of such an address in a second
+    std::size_t connectionRate = 20;     ///< new ones of such an address in a second, then
     std::size_t checksEach = 8;          ///< passwords of an address that are checked or refused
     std::size_t refusalsEach = 60;       ///< wrong passwords of an address in a minute
     std::size_t memory = 48U << 20U;     ///< bytes that all requests take
