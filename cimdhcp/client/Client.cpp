@@ -21,8 +21,23 @@ std::vector<Object> present(std::vector<std::optional<Object>> objects) {
 
 }  // namespace
 
+void leaveOutNulls(cimom::Instance& instance) {
+    std::erase_if(instance.properties,
+                  [](const cimom::NamedValue& each) { return each.value.isNull(); });
+}
+
 cimom::ObjectPath Client::classPath(const std::string& className) const {
     return {"", nameSpace_, className, {}};
+}
+
+Response Client::enumerateWith(const cimom::ObjectPath& path,
+                               const std::vector<std::string>& /*properties*/) {
+    return enumerate(path);
+}
+
+Response Client::getWith(const cimom::ObjectPath& path,
+                         const std::vector<std::string>& /*properties*/) {
+    return get(path);
 }
 
 std::vector<cimom::ObjectPath> Client::pathsIn(const std::string& className) {
