@@ -4,12 +4,15 @@
 #include <algorithm>
 #include <map>
 #include <memory>
+#include <utility>
 
 #include "arguments/HelpFormatter.h"
 #include "arguments/OptionGroups.h"
+#include "arguments/UnfinishedLine.h"
 #include "client/InterfaceState.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
+#include "text/Likeness.h"
 
 namespace cimdhcp {
 
@@ -29,6 +32,7 @@ constexpr const char* pathHelp =
 constexpr const char* footer = R"(
 Examples:
   cimdhcp show
+  cimdhcp show eth0
   cimdhcp rename eth0 office
   cimdhcp instances QVXZR_DHCPProtocolEndpoint
   cimdhcp get 'QVXZR_DHCPSettingData.InstanceID="Computer%eth0"'
@@ -41,12 +45,12 @@ Examples:
 
 Exit status:
   0  done
-  1  the response has a CIM status other than OK (its name is on standard error),
-     a rename was not possible, nothing was modified, or the check has found
-     something wrong
+  1  the request was not fulfilled: a CIM status other than OK (its name is on
+     standard error), something named does not exist, a rename was not possible,
+     nothing was modified, or the check has found something wrong
   2  the command line cannot be understood
-  3  the provider or a file cannot be loaded, a server cannot be reached or
-     understood, or the output cannot be written
+  3  the provider, a directory or a file cannot be loaded or understood, a server
+     cannot be reached or understood, or the output cannot be written
   4  some of several servers have failed
   130  interrupted while servers were asked
 
@@ -54,7 +58,7 @@ Schema, registrations and providers are those that are installed with the progra
 unless an advanced option or one of the environment variables CIMDHCP_SCHEMA_DIR,
 CIMDHCP_REGISTRATION_DIR and CIMDHCP_PROVIDER_DIR names others.
 
-"cimdhcp COMMAND --help" explains a command. The options above may stand
+"cimdhcp help COMMAND" explains a command. The options above may stand
 before or behind the command.)";
 
 constexpr const char* checkHelp =
@@ -78,6 +82,9 @@ std::string showHelp() {
         text += "  " + word + std::string(each.meaning) + '\n';
     }
     return text + R"(
+With names of interfaces, each of these is told in detail: its leases, its DHCP endpoint,
+its servers, its setting, and what the diagnostics tell of it.
+
 CLIENT is the program that has the lease or asks for one, ADDRESS the IPv4 address or
 else that of a DHCPv6 lease, EXPIRES when the lease ends. Of several leases, the table
 has one: IPv4 comes first. "-" is what there is not, "?" what is not known; notes on
@@ -116,6 +123,13 @@ that was killed, by the next run of the same user.
 It ends with Ctrl-C or SIGTERM, and then with exit status 0. A server that does not respond
 is told on standard error, and asked again.)";
 
+constexpr const char* describeHelp =
+    R"(Of each property: its type, whether it is a key (key) or can be changed (writable), what
+it means, and what its values stand for.
+
+With --format json, "class", "superclass", "association", "description" and "properties",
+each with "name", "type", "array", "key", "writable", "description" and "values".)";
+
 constexpr const char* profilesHelp =
     R"(The profiles come from the server's interop namespace. INSTANCES is how many instances
 conform to a profile; "-" where the server does not tell.
@@ -127,6 +141,7 @@ constexpr const char* machineGroup = "The machine";
 constexpr const char* classGroup = "Classes and instances";
 constexpr const char* associationGroup = "Associations";
 constexpr const char* serverGroup = "The WBEM server";
+constexpr const char* helpGroup = "Help";
 constexpr const char* advancedGroup = "Advanced options";
 
 /// Whether an option of the program or of any command takes a value.
@@ -161,6 +176,52 @@ std::vector<std::string> withEmptyValues(const CLI::App& app,
     return result;
 }
 
+/// What a person typed, short enough for a message.
+std::string excerptOf(const std::string& text) {
+    constexpr std::size_t longest = 60;
+    return '"' + cutToWidth(printable(text), longest) + '"';
+}
+
+std::vector<const CLI::App*> commandsOf(const CLI::App& app) {
+    return app.get_subcommands([](const CLI::App* each) { return !each->get_group().empty(); });
+}
+
+std::vector<std::string> commandNames(const CLI::App& app) {
+    std::vector<std::string> names;
+    for (const CLI::App* const each : commandsOf(app)) {
+        names.push_back(each->get_name());
+    }
+    return names;
+}
+
+/// The options of the program, and those of the commands that were named.
+std::vector<std::string> optionNames(const CLI::App& app) {
+    std::vector<std::string> names;
+    for (const CLI::Option* const option : app.get_options()) {
+        for (const std::string& name : option->get_lnames()) {
+            names.push_back("--" + name);
+        }
+    }
+    for (const CLI::App* const command : app.get_subcommands()) {
+        for (std::string& name : optionNames(*command)) {
+            names.push_back(std::move(name));
+        }
+    }
+    return names;
+}
+
+/// The words in their order, the first few of them.
+std::string listOf(const std::vector<std::string>& words) {
+    constexpr std::size_t mostListed = 4;
+    std::string text;
+    for (std::size_t index = 0; index < std::min(words.size(), mostListed); ++index) {
+        text += (index == 0 ? "" : ", ") + excerptOf(words[index]);
+    }
+    return text + (words.size() > mostListed
+                       ? " and " + std::to_string(words.size() - mostListed) + " more"
+                       : "");
+}
+
 /// What is read of each command.
 struct Records {
     ShowCommand show;
@@ -181,6 +242,8 @@ struct Records {
     ProfilesCommand profiles;
     MetricsCommand metrics;
     ExporterCommand exporter;
+    DescribeCommand describe;
+    std::vector<std::string> help;
 };
 
 }  // namespace
@@ -190,7 +253,7 @@ class CommandLineReader::Parser {
   public:
     Parser() : app_(description, "cimdhcp") {
         app_.formatter(std::make_shared<HelpFormatter>());
-        app_.set_version_flag("--version", "cimdhcp " CIMDHCP_VERSION, "Print the version");
+        app_.set_version_flag("-V,--version", "cimdhcp " CIMDHCP_VERSION, "Print the version");
         app_.set_help_flag("-h,--help", "Print this help");
         // Options may stand behind the command, too.
         app_.fallthrough();
@@ -201,13 +264,20 @@ class CommandLineReader::Parser {
         addInstanceCommands();
         addAssociationCommands();
         addServerCommands();
+        addHelp();
         // Commands inherit the footer when they are made: they are made before it.
         app_.footer(std::string(pathHelp) + '\n' + footer);
     }
 
+    [[nodiscard]] const CLI::App& app() const noexcept { return app_; }
+
     std::variant<CommandLine, Information> read(const std::vector<std::string>& arguments) {
         line_ = {};
         records_ = {};
+        if (!arguments.empty() && arguments.front() == completeCommand) {
+            // What a person has typed so far may be anything.
+            return CommandLine{{}, CompleteCommand{{arguments.begin() + 1, arguments.end()}}};
+        }
         try {
             // The parser takes them from the end.
             const std::vector<std::string> whole = withEmptyValues(app_, arguments);
@@ -217,7 +287,11 @@ class CommandLineReader::Parser {
         } catch (const CLI::CallForVersion& version) {
             return Information{std::string(version.what()) + '\n'};
         } catch (const CLI::ParseError& error) {
-            refuse(reasonOf(error));
+            refuse(reasonOf(error, arguments));
+        }
+        if (app_.got_subcommand(help_)) {
+            app_.clear();  // the parser would tell the help of the command that was given
+            return Information{helpOf(records_.help)};
         }
         if (app_.get_subcommands().empty()) {
             refuse("a command is missing");
@@ -231,14 +305,61 @@ class CommandLineReader::Parser {
         throw Failure(ExitStatus::usage, reason + " (\"cimdhcp --help\" tells more)");
     }
 
-    [[nodiscard]] std::string reasonOf(const CLI::ParseError& error) const {
+    [[nodiscard]] std::string reasonOf(const CLI::ParseError& error,
+                                       const std::vector<std::string>& arguments) const {
+        constexpr std::size_t longest = 300;
         const bool extra = dynamic_cast<const CLI::ExtrasError*>(&error) != nullptr;
-        const std::vector<std::string> rest = app_.remaining();
-        if (extra && app_.get_subcommands().empty() && !rest.empty() &&
-            !rest.front().starts_with('-')) {
-            return "there is no command \"" + printable(rest.front()) + '"';
+        const std::vector<std::string> rest =
+            extra ? inOrder(app_.remaining(true), arguments) : std::vector<std::string>();
+        if (rest.empty()) {
+            return cutToWidth(printable(error.what()), longest);
         }
-        return printable(error.what());
+        const auto option = std::find_if(rest.begin(), rest.end(), [](const std::string& each) {
+            return each.starts_with('-') && each.size() > 1;
+        });
+        if (option != rest.end()) {
+            const std::string name = option->substr(0, option->find('='));
+            return "there is no option " + excerptOf(name) + didYouMean(name, optionNames(app_));
+        }
+        if (app_.get_subcommands().empty()) {
+            return noCommand(app_, rest.front());
+        }
+        return std::string(rest.size() == 1 ? "one argument" : "arguments") +
+               " too many: " + listOf(rest);
+    }
+
+    static std::string noCommand(const CLI::App& app, const std::string& name) {
+        return "there is no command " + excerptOf(name) + didYouMean(name, commandNames(app));
+    }
+
+    /// The words in the order in which they were typed.
+    static std::vector<std::string> inOrder(std::vector<std::string> words,
+                                            const std::vector<std::string>& arguments) {
+        std::stable_sort(words.begin(), words.end(),
+                         [&arguments](const std::string& a, const std::string& b) {
+                             return std::find(arguments.begin(), arguments.end(), a) <
+                                    std::find(arguments.begin(), arguments.end(), b);
+                         });
+        return words;
+    }
+
+    /// The help of the command that the words name, of the program for none.
+    [[nodiscard]] std::string helpOf(const std::vector<std::string>& words) const {
+        const CLI::App* app = &app_;
+        std::string before;
+        for (const std::string& word : words) {
+            const auto commands = commandsOf(*app);
+            const auto found =
+                std::find_if(commands.begin(), commands.end(),
+                             [&word](const CLI::App* each) { return each->get_name() == word; });
+            if (found == commands.end()) {
+                refuse(commands.empty() ? "one argument too many: " + excerptOf(word)
+                                        : noCommand(*app, word));
+            }
+            before += (before.empty() ? "" : " ") + app->get_name();
+            app = *found;
+        }
+        return app->help(before);
     }
 
     void addOptions() {
@@ -251,19 +372,21 @@ class CommandLineReader::Parser {
         app_.add_option("--namespace", line_.options.nameSpace,
                         "The CIM namespace; root/cimv2 by default")
             ->type_name("NS");
-        const std::map<std::string, Format> formats{
-            {"table", Format::table}, {"mof", Format::mof}, {"json", Format::json}};
+        const std::map<std::string, Format> formats{{"table", Format::table},
+                                                    {"tsv", Format::tsv},
+                                                    {"mof", Format::mof},
+                                                    {"json", Format::json}};
         app_.add_option_function<std::string>(
                 "--format",
                 [this, formats](const std::string& name) {
                     line_.options.format = formats.at(name);
                 },
-                "table (the default), mof or json")
+                "table (the default), tsv, mof or json")
             ->type_name("FORMAT")
             ->check([formats](const std::string& name) {
                 return formats.contains(name)
                            ? std::string()
-                           : "there is no format \"" + name + "\", only table, mof and json";
+                           : "there is no format \"" + name + "\", only table, tsv, mof and json";
             });
         addRemoteOptions(app_, line_.options);
         addOutputOptions(app_, line_.options);
@@ -306,9 +429,11 @@ class CommandLineReader::Parser {
     }
 
     void addMachineCommands() {
-        command("show", machineGroup, "The network interfaces and their DHCP clients",
-                records_.show)
-            ->footer(showHelp());
+        CLI::App* const show = command(
+            "show", machineGroup, "The network interfaces and their DHCP clients", records_.show);
+        show->add_option("INTERFACE", records_.show.interfaces,
+                         "Interfaces to show in detail, such as eth0");
+        show->footer(showHelp());
         addWatch();
         CLI::App* const rename = command(
             "rename", machineGroup, "Change an interface's configuration name", records_.rename);
@@ -349,8 +474,14 @@ class CommandLineReader::Parser {
             command("instances", classGroup, "The instances of a class", records_.instances);
         instances->add_option("CLASS", records_.instances.className, "The class, or a parent of it")
             ->required();
+        addProperties(*instances, records_.instances.properties);
+        CLI::App* const describe = command(
+            "describe", classGroup, "What a class and its properties mean", records_.describe);
+        describe->add_option("CLASS", records_.describe.className, "The class")->required();
+        describe->footer(describeHelp);
         CLI::App* const get = command("get", classGroup, "One instance", records_.get);
         addPath(get, records_.get.path);
+        addProperties(*get, records_.get.properties);
         CLI::App* const modify =
             command("modify", classGroup, "Change properties of an instance", records_.modify);
         addPath(modify, records_.modify.path);
@@ -418,6 +549,17 @@ class CommandLineReader::Parser {
         add->add_flag("--modify", records_.userAdd.mayModify, "The user may modify, not only read");
     }
 
+    void addHelp() {
+        help_ = app_.add_subcommand("help", "Explain the program, or a command");
+        help_->group(helpGroup);
+        help_->add_option("COMMAND", records_.help, "The command");
+    }
+
+    static void addProperties(CLI::App& app, std::vector<std::string>& properties) {
+        addList(app, "--properties", properties, "These properties alone, in this order",
+                "PROPERTY,...");
+    }
+
     static void addPath(CLI::App* app, std::string& path) {
         app->add_option("PATH", path, "The instance")->required();
         app->footer(pathHelp);
@@ -431,6 +573,7 @@ class CommandLineReader::Parser {
     CommandLine line_;
     Records records_;
     CLI::App app_;
+    CLI::App* help_ = nullptr;  // of app_
 };
 
 CommandLineReader::CommandLineReader() : parser_(std::make_unique<Parser>()) {}
@@ -440,6 +583,18 @@ CommandLineReader::~CommandLineReader() = default;
 std::variant<CommandLine, Information> CommandLineReader::read(
     const std::vector<std::string>& arguments) {
     return parser_->read(arguments);
+}
+
+UnfinishedLine CommandLineReader::readUnfinished(const std::vector<std::string>& words) {
+    UnfinishedLine unfinished = whatIsUnfinished(parser_->app(), words);
+    try {
+        std::vector<std::string> arguments = unfinished.optionWords;
+        arguments.emplace_back("classes");
+        unfinished.options = std::get<CommandLine>(parser_->read(arguments)).options;
+    } catch (const Failure&) {
+        unfinished.options.reset();  // they do not fit together, or are unfinished themselves
+    }
+    return unfinished;
 }
 
 std::variant<CommandLine, Information> readCommandLine(const std::vector<std::string>& arguments) {

@@ -6,6 +6,7 @@
 #include <vector>
 
 #include "arguments/Commands.h"
+#include "arguments/UnfinishedLine.h"
 
 namespace cimdhcp {
 
@@ -30,6 +31,10 @@ class CommandLineReader {
     /// Throws Failure with ExitStatus::usage.
     [[nodiscard]] std::variant<CommandLine, Information> read(
         const std::vector<std::string>& arguments);
+
+    /// Reads what stands before the end of a line that is still typed. Throws nothing: what
+    /// cannot be understood is not completed.
+    [[nodiscard]] UnfinishedLine readUnfinished(const std::vector<std::string>& words);
 
   private:
     class Parser;

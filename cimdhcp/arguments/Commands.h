@@ -23,6 +23,15 @@ struct DirectoryOptions {
     bool operator==(const DirectoryOptions&) const = default;
 };
 
+/// What tables look like.
+struct TableOptions {
+    bool noHeader = false;
+    bool wide = false;                 ///< as wide as they are, on a terminal, too
+    std::vector<std::string> columns;  ///< these, in this order; none: all
+
+    bool operator==(const TableOptions&) const = default;
+};
+
 /// What holds for every command.
 struct Options {
     std::optional<std::string> tree;     ///< a JSON tree in place of the live machine
@@ -31,6 +40,7 @@ struct Options {
     Format format = Format::table;
     DirectoryOptions directories;
     bool exact = false;  ///< the exact provider, without the gateway in front of it
+    bool debug = false;  ///< JSON with what helps to debug a provider
 
     // The servers that are asked in place of the object manager of this process.
     std::vector<std::string> connect;  ///< URLs or hosts
@@ -40,9 +50,10 @@ struct Options {
     std::optional<std::string> caCertificate;
     bool insecure = false;
     std::optional<std::string> credentials;
+    std::optional<std::string> failed;  ///< a file that gets the servers that failed
 
     // How the result is shown.
-    bool noHeader = false;
+    TableOptions table;
     std::optional<std::string> sort;
     bool count = false;
     bool time = false;
@@ -54,6 +65,8 @@ struct Options {
 };
 
 struct ShowCommand {
+    std::vector<std::string> interfaces{};  ///< these in detail; none: all at a glance
+
     bool operator==(const ShowCommand&) const = default;
 };
 struct WatchCommand {
@@ -87,6 +100,11 @@ struct TreeCommand {
 struct ClassesCommand {
     bool operator==(const ClassesCommand&) const = default;
 };
+struct DescribeCommand {
+    std::string className;
+
+    bool operator==(const DescribeCommand&) const = default;
+};
 struct NamesCommand {
     std::string className;
 
@@ -94,11 +112,13 @@ struct NamesCommand {
 };
 struct InstancesCommand {
     std::string className;
+    std::vector<std::string> properties{};  ///< these alone; none: all
 
     bool operator==(const InstancesCommand&) const = default;
 };
 struct GetCommand {
     std::string path;
+    std::vector<std::string> properties{};  ///< these alone; none: all
 
     bool operator==(const GetCommand&) const = default;
 };
@@ -165,12 +185,19 @@ struct ExporterCommand {
 struct CheckCommand {
     bool operator==(const CheckCommand&) const = default;
 };
+/// What a shell asks for on behalf of a person who has not finished a command line.
+struct CompleteCommand {
+    std::vector<std::string> words;  ///< behind the program's name; the last is completed
+
+    bool operator==(const CompleteCommand&) const = default;
+};
 
 using Command =
     std::variant<ShowCommand, WatchCommand, RenameCommand, GraphCommand, TreeCommand,
                  ClassesCommand, NamesCommand, InstancesCommand, GetCommand, ModifyCommand,
                  AssociatorsCommand, ReferencesCommand, ServeCommand, UserAddCommand, CheckCommand,
-                 ProfilesCommand, MetricsCommand, ExporterCommand>;
+                 ProfilesCommand, MetricsCommand, ExporterCommand, DescribeCommand,
+                 CompleteCommand>;
 
 struct CommandLine {
     Options options;

@@ -57,7 +57,8 @@ class HelpFormatter : public CLI::Formatter {
         for (const CLI::Option* const option : app->get_options()) {
             if (option->get_positional()) {
                 const bool several = option->get_expected_max() > 1;
-                text += ' ' + option->get_name(true) + (several ? "..." : "");
+                const std::string one = option->get_name(true) + (several ? "..." : "");
+                text += ' ' + (option->get_required() ? one : '[' + one + ']');
             }
         }
         return text;

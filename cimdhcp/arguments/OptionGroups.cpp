@@ -6,7 +6,11 @@
 #include <cstdint>
 #include <map>
 #include <optional>
+#include <sstream>
 #include <string>
+#include <vector>
+
+#include "zrcommon/Strings.h"
 
 namespace cimdhcp {
 
@@ -108,6 +112,33 @@ void addDelivery(CLI::App& app, ServeCommand& serve) {
 
 }  // namespace
 
+CLI::Option* addList(CLI::App& app, const char* option, std::vector<std::string>& values,
+                     const char* text, const char* type) {
+    return app
+        .add_option_function<std::vector<std::string>>(
+            option,
+            [&values, name = std::string(option)](const std::vector<std::string>& lists) {
+                for (const std::string& list : lists) {
+                    std::istringstream parts(list);
+                    for (std::string part; std::getline(parts, part, ',');) {
+                        const std::string word(ZR::trim(part));
+                        if (word.empty()) {
+                            throw CLI::ValidationError(name, "a name is empty in \"" + list + '"');
+                        }
+                        values.push_back(word);
+                    }
+                }
+            },
+            text)
+        ->type_name(type)
+        ->expected(1)
+        ->allow_extra_args(false)
+        ->multi_option_policy(CLI::MultiOptionPolicy::TakeAll)
+        ->check([](const std::string& list) {
+            return list.empty() ? std::string("it needs a name") : std::string();
+        });
+}
+
 void addRemoteOptions(CLI::App& app, Options& options) {
     const auto file = [&app](const char* name, std::optional<std::string>& value,
                              const char* text) {
@@ -138,16 +169,24 @@ void addRemoteOptions(CLI::App& app, Options& options) {
     file("--cacert", options.caCertificate, "Who vouches for servers (PEM), not the system's");
     app.add_flag("--insecure", options.insecure, "Trust any server, and send passwords over http")
         ->group(serversGroup);
+    file("--failed", options.failed, "Gets the servers that failed, as a file for --hosts");
 }
 
 void addOutputOptions(CLI::App& app, Options& options) {
-    app.add_flag("--no-header", options.noHeader, "Tables without their headings")
+    app.add_flag("--no-header", options.table.noHeader, "Tables without their headings")
+        ->group(outputGroup);
+    app.add_flag("--wide", options.table.wide, "Tables as wide as they are, on a terminal, too")
+        ->group(outputGroup);
+    addList(app, "--columns", options.table.columns, "Tables with these columns, in this order",
+            "COLUMN,...")
         ->group(outputGroup);
     app.add_option("--sort", options.sort, "Sort by a column, by PATH or by a property")
         ->type_name("COLUMN")
         ->group(outputGroup);
     app.add_flag("--count", options.count, "The number of results alone")->group(outputGroup);
     app.add_flag("--time", options.time, "Tell how long it took")->group(outputGroup);
+    app.add_flag("--debug", options.debug, "JSON with what helps to debug a provider")
+        ->group(outputGroup);
     const std::map<std::string, ColorMode> modes{
         {"auto", ColorMode::automatic}, {"always", ColorMode::always}, {"never", ColorMode::never}};
     app.add_option_function<std::string>(

@@ -1,16 +1,23 @@
 #pragma once
 
+#include <string>
+#include <vector>
+
 #include "arguments/Commands.h"
 
 namespace CLI {
 class App;
-}
+class Option;
+}  // namespace CLI
 
 namespace cimdhcp {
 
 // Options that stand together in the help. They are read into the records,
 // which must live as long as the parser.
 
+/// An option with names that commas separate, added to those that there are.
+CLI::Option* addList(CLI::App& app, const char* option, std::vector<std::string>& values,
+                     const char* text, const char* type);
 /// Which servers are asked, and how.
 void addRemoteOptions(CLI::App& app, Options& options);
 /// How results are shown.

@@ -22,10 +22,15 @@ bool givesList(const Command& command) noexcept {
                                            ModifyCommand, MetricsCommand>(command);
 }
 
+/// Whether what the command prints has columns.
+bool hasColumns(const Command& command) noexcept {
+    return givesList(command) || isOneOf<GetCommand>(command);
+}
+
 bool hasMofForm(const Command& command) noexcept {
     return asksClient(command) &&
            !isOneOf<ShowCommand, WatchCommand, RenameCommand, GraphCommand, ClassesCommand,
-                    ProfilesCommand, MetricsCommand>(command);
+                    ProfilesCommand, MetricsCommand, DescribeCommand>(command);
 }
 
 [[noreturn]] void refuse(const std::string& reason) {
@@ -40,6 +45,9 @@ void checkServers(const CommandLine& line) {
             refuse(
                 "--credentials, --cacert and --insecure are about servers; name "
                 "one with --connect, or several with --hosts");
+        }
+        if (options.failed) {
+            refuse("--failed gets servers that failed; name them with --connect or --hosts");
         }
         return;
     }
@@ -63,6 +71,9 @@ void checkServers(const CommandLine& line) {
     if (rename != nullptr && rename->create) {
         refuse("--create cannot make files on other machines");
     }
+    if (options.failed && isOneOf<WatchCommand>(line.command)) {
+        refuse("a watch asks servers that fail again; --failed is not for it");
+    }
 }
 
 void checkFormat(const CommandLine& line) {
@@ -77,6 +88,18 @@ void checkFormat(const CommandLine& line) {
     }
     if (format == Format::mof && !hasMofForm(line.command)) {
         refuse("this command has no MOF output; use --format table or json");
+    }
+    if (format == Format::tsv && !hasColumns(line.command)) {
+        refuse("the result of this command has no columns: it has no tsv output");
+    }
+    if (line.options.table.columns.empty()) {
+        return;
+    }
+    if (!hasColumns(line.command)) {
+        refuse("the result of this command has no columns to choose from");
+    }
+    if (format != Format::table && format != Format::tsv) {
+        refuse("--columns is for --format table and tsv");
     }
 }
 
@@ -102,7 +125,8 @@ void checkLimits(const Command& command) {
 }  // namespace
 
 bool asksClient(const Command& command) noexcept {
-    return !isOneOf<TreeCommand, ServeCommand, UserAddCommand, CheckCommand, ExporterCommand>(
+    return !isOneOf<TreeCommand, ServeCommand, UserAddCommand, CheckCommand, ExporterCommand,
+                    CompleteCommand>(
         command);
 }
 

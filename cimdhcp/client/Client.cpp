@@ -30,6 +30,16 @@ cimom::ObjectPath Client::classPath(const std::string& className) const {
     return {"", nameSpace_, className, {}};
 }
 
+Response Client::enumerateWith(const cimom::ObjectPath& path,
+                               const std::vector<std::string>& /*properties*/) {
+    return enumerate(path);
+}
+
+Response Client::getWith(const cimom::ObjectPath& path,
+                         const std::vector<std::string>& /*properties*/) {
+    return get(path);
+}
+
 std::vector<cimom::ObjectPath> Client::pathsIn(const std::string& className) {
     const cimom::ObjectPath path = classPath(className);
     Response response = enumerateNames(path);

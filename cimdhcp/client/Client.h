@@ -41,6 +41,11 @@ class Client {
     virtual Response enumerateNames(const cimom::ObjectPath& path) = 0;
     virtual Response enumerate(const cimom::ObjectPath& path) = 0;
     virtual Response get(const cimom::ObjectPath& path) = 0;
+    // The same with a property list. The instances may have more than it names.
+    virtual Response enumerateWith(const cimom::ObjectPath& path,
+                                   const std::vector<std::string>& properties);
+    virtual Response getWith(const cimom::ObjectPath& path,
+                             const std::vector<std::string>& properties);
     /// Changes the properties that are named, to what the instance has for them. Providers
     /// that do not look at the names should find the others as they are in the instance.
     virtual Response modify(const cimom::Instance& instance,

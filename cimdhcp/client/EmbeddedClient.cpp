@@ -97,6 +97,16 @@ Response EmbeddedClient::get(const cimom::ObjectPath& path) {
     return responseOf("GetInstance", manager_->getInstance(path));
 }
 
+Response EmbeddedClient::enumerateWith(const cimom::ObjectPath& path,
+                                       const std::vector<std::string>& properties) {
+    return responseOf("EnumerateInstances", manager_->enumerateInstances(path, {properties, {}}));
+}
+
+Response EmbeddedClient::getWith(const cimom::ObjectPath& path,
+                                 const std::vector<std::string>& properties) {
+    return responseOf("GetInstance", manager_->getInstance(path, {properties, {}}));
+}
+
 Response EmbeddedClient::modify(const cimom::Instance& instance,
                                 const std::vector<std::string>& properties) {
     cimom::InstanceRequest request;

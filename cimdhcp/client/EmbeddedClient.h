@@ -28,6 +28,10 @@ class EmbeddedClient : public Client {
     Response enumerateNames(const cimom::ObjectPath& path) override;
     Response enumerate(const cimom::ObjectPath& path) override;
     Response get(const cimom::ObjectPath& path) override;
+    Response enumerateWith(const cimom::ObjectPath& path,
+                           const std::vector<std::string>& properties) override;
+    Response getWith(const cimom::ObjectPath& path,
+                     const std::vector<std::string>& properties) override;
     Response modify(const cimom::Instance& instance,
                     const std::vector<std::string>& properties) override;
     Response associatorNames(const cimom::ObjectPath& path,

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <cstdint>
+#include <iterator>
 #include <string_view>
 #include <unordered_map>
 #include <unordered_set>
@@ -164,6 +165,33 @@ LeaseOverview leaseOf(const ZR::Snapshot& snapshot, ZR::Snapshot::Index node) {
     return lease;
 }
 
+/// The interface that an instance is about, as idOf() names it.
+std::string idOfEndpoint(const cimom::Instance& endpoint) {
+    return idOf(systemOf(endpoint), text(endpoint, "Name"));
+}
+
+std::string idOfAccessPoint(const cimom::Instance& point) {
+    // Its name is the interface's with the kind of address behind it.
+    const std::string name = text(point, "Name");
+    return idOf(systemOf(point), name.substr(0, name.rfind('_')));
+}
+
+std::string idOfSetting(const cimom::Instance& setting) {
+    return text(setting, "InstanceID");
+}
+
+std::optional<std::vector<cimom::Instance>> only(
+    const std::string& id, const std::optional<std::vector<cimom::Instance>>& instances,
+    std::string (*idOfInstance)(const cimom::Instance&)) {
+    if (!instances) {
+        return std::nullopt;
+    }
+    std::vector<cimom::Instance> found;
+    std::copy_if(instances->begin(), instances->end(), std::back_inserter(found),
+                 [&](const cimom::Instance& each) { return idOfInstance(each) == id; });
+    return found;
+}
+
 }  // namespace
 
 std::optional<InterfaceId> readInterfaceId(const std::string& text) {
@@ -290,16 +318,13 @@ void addServed(const ServedInstances& served, std::vector<InterfaceOverview>& in
     std::unordered_map<std::string, const cimom::Instance*> settings;
     const std::vector<cimom::Instance> nothing;
     for (const cimom::Instance& endpoint : served.endpoints ? *served.endpoints : nothing) {
-        endpoints[idOf(systemOf(endpoint), text(endpoint, "Name"))] = &endpoint;
+        endpoints[idOfEndpoint(endpoint)] = &endpoint;
     }
     for (const cimom::Instance& point : served.accessPoints ? *served.accessPoints : nothing) {
-        // Its name is the interface's with the kind of address behind it.
-        const std::string name = text(point, "Name");
-        servers[idOf(systemOf(point), name.substr(0, name.rfind('_')))].push_back(
-            text(point, "AccessInfo"));
+        servers[idOfAccessPoint(point)].push_back(text(point, "AccessInfo"));
     }
     for (const cimom::Instance& setting : served.settings ? *served.settings : nothing) {
-        settings[text(setting, "InstanceID")] = &setting;
+        settings[idOfSetting(setting)] = &setting;
     }
     for (InterfaceOverview& interface : interfaces) {
         const std::string id = idOf(interface.system, interface.name);
@@ -322,6 +347,12 @@ void addServed(const ServedInstances& served, std::vector<InterfaceOverview>& in
             interface.configurationName.emplace();
         }
     }
+}
+
+ServedInstances servedOf(const InterfaceOverview& interface, const ServedInstances& served) {
+    const std::string id = idOf(interface.system, interface.name);
+    return {only(id, served.endpoints, idOfEndpoint),
+            only(id, served.accessPoints, idOfAccessPoint), only(id, served.settings, idOfSetting)};
 }
 
 }  // namespace cimdhcp

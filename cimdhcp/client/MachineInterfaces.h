@@ -80,6 +80,8 @@ struct ServedInstances {
     std::optional<std::vector<cimom::Instance>> endpoints;
     std::optional<std::vector<cimom::Instance>> accessPoints;
     std::optional<std::vector<cimom::Instance>> settings;
+
+    bool operator==(const ServedInstances&) const = default;
 };
 
 /// The interfaces of a tree in its order, with all but what the provider alone tells:
@@ -108,5 +110,9 @@ struct ServedInstances {
 /// Puts what the provider tells beside the interfaces. Whether DHCP is on is taken from it
 /// where nothing else tells.
 void addServed(const ServedInstances& served, std::vector<InterfaceOverview>& interfaces);
+
+/// What of that is about one interface.
+[[nodiscard]] ServedInstances servedOf(const InterfaceOverview& interface,
+                                       const ServedInstances& served);
 
 }  // namespace cimdhcp

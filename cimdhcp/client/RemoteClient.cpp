@@ -223,18 +223,44 @@ Response RemoteClient::enumerateNames(const cimom::ObjectPath& path) {
 }
 
 Response RemoteClient::enumerate(const cimom::ObjectPath& path) {
+    return enumerateAsked(path, nullptr);
+}
+
+Response RemoteClient::enumerateWith(const cimom::ObjectPath& path,
+                                     const std::vector<std::string>& properties) {
+    return enumerateAsked(path, &properties);
+}
+
+Response RemoteClient::enumerateAsked(const cimom::ObjectPath& path,
+                                      const std::vector<std::string>* properties) {
     OperationRequest request = reading("EnumerateInstances", path);
     request.className("ClassName", path.className)
         .flag("LocalOnly", false)
         .flag("DeepInheritance", true);
     addForm(request);
+    if (properties != nullptr) {
+        request.texts("PropertyList", *properties);
+    }
     return instancesOf(request);
 }
 
 Response RemoteClient::get(const cimom::ObjectPath& path) {
+    return getAsked(path, nullptr);
+}
+
+Response RemoteClient::getWith(const cimom::ObjectPath& path,
+                               const std::vector<std::string>& properties) {
+    return getAsked(path, &properties);
+}
+
+Response RemoteClient::getAsked(const cimom::ObjectPath& path,
+                                const std::vector<std::string>* properties) {
     OperationRequest request = reading("GetInstance", path);
     request.instanceName("InstanceName", path).flag("LocalOnly", false);
     addForm(request);
+    if (properties != nullptr) {
+        request.texts("PropertyList", *properties);
+    }
     Response response = instancesOf(request);
     for (auto& instance : response.instances) {
         instance->path = wholePath(*instance, path, findClass(instance->path.className));

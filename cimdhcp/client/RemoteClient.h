@@ -46,6 +46,10 @@ class RemoteClient : public Client {
     Response enumerateNames(const cimom::ObjectPath& path) override;
     Response enumerate(const cimom::ObjectPath& path) override;
     Response get(const cimom::ObjectPath& path) override;
+    Response enumerateWith(const cimom::ObjectPath& path,
+                           const std::vector<std::string>& properties) override;
+    Response getWith(const cimom::ObjectPath& path,
+                     const std::vector<std::string>& properties) override;
     Response modify(const cimom::Instance& instance,
                     const std::vector<std::string>& properties) override;
     /// The response has the path of what was created.
@@ -67,6 +71,10 @@ class RemoteClient : public Client {
     cimom::wbem::OperationResponse ask(const cimom::wbem::OperationRequest& request);
     template <typename Read>
     Response responseTo(const cimom::wbem::OperationRequest& request, const Read& read);
+    // Null: all properties.
+    Response enumerateAsked(const cimom::ObjectPath& path,
+                            const std::vector<std::string>* properties);
+    Response getAsked(const cimom::ObjectPath& path, const std::vector<std::string>* properties);
     Response pathsOf(const cimom::wbem::OperationRequest& request);
     Response instancesOf(const cimom::wbem::OperationRequest& request);
     const cimom::ClassDeclaration* findClass(std::string_view className);

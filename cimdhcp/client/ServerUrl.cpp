@@ -49,12 +49,12 @@ std::vector<ServerUrl> readServers(std::istream& lines, const std::string& name)
         try {
             servers.push_back(readServerUrl(line));
         } catch (const Failure& failure) {
-            throw Failure(ExitStatus::usage,
+            throw Failure(ExitStatus::notLoaded,
                           name + ": line " + std::to_string(number) + ": " + failure.what());
         }
     }
     if (servers.empty()) {
-        throw Failure(ExitStatus::usage, name + ": no server is named in it");
+        throw Failure(ExitStatus::notLoaded, name + ": no server is named in it");
     }
     return servers;
 }

@@ -4,19 +4,22 @@
 #include <type_traits>
 #include <utility>
 
+#include "arguments/ArgumentValue.h"
+#include "cimom/ClassDeclaration.h"
 #include "client/Client.h"
 #include "client/Response.h"
-#include "commands/CimOperations.h"
-#include "commands/ClassTable.h"
+#include "commands/Detail.h"
 #include "commands/DiagnosticText.h"
-#include "commands/Findings.h"
 #include "commands/Graph.h"
 #include "commands/Metrics.h"
 #include "commands/Overview.h"
 #include "commands/PlatformSetup.h"
 #include "commands/Profiles.h"
-#include "commands/Rename.h"
-#include "commands/ResponseText.h"
+#include "commands/check/Findings.h"
+#include "commands/classes/CimOperations.h"
+#include "commands/classes/ClassTable.h"
+#include "commands/classes/ResponseText.h"
+#include "commands/rename/Rename.h"
 #include "text/JsonText.h"
 
 namespace cimdhcp {
@@ -31,14 +34,33 @@ class Execution {
     Execution(Client& client, const Presentation& presentation)
         : client_(client), presentation_(presentation) {}
 
-    Outcome operator()(const ShowCommand& /*command*/) const {
+    Outcome operator()(const ShowCommand& command) const {
+        const ServedInstances served = askServed(client_);
         // Those of a tree are told by the name that a person gave it.
-        MachineInterfaces machine =
-            askMachine(client_, treeName().empty() ? AskDiagnostics::Yes : AskDiagnostics::No);
+        MachineInterfaces machine = askMachine(
+            client_, treeName().empty() ? AskDiagnostics::Yes : AskDiagnostics::No, served);
+        std::vector<InterfaceDetail> details;
+        if (!command.interfaces.empty()) {
+            details = detailsOf(command.interfaces, served, machine);
+            machine.interfaces.clear();
+            for (const InterfaceDetail& detail : details) {
+                machine.interfaces.push_back(detail.overview);
+            }
+        }
         const std::int64_t now = presentation_.now;
         std::string diagnostics = diagnosticText(machine.diagnostics, machine.interfaces);
         if (!presentation_.count) {
             diagnostics += unknownText(machine.interfaces, now);
+        }
+        const bool inDetail = !details.empty() && !presentation_.sort && !presentation_.count &&
+                              presentation_.columns.empty();
+        if (inDetail && presentation_.json()) {
+            return {detailJson(details, now), std::move(diagnostics), std::nullopt};
+        }
+        if (inDetail && presentation_.format == Format::table) {
+            return {detailText(details, now, client_.classes(), presentation_.width,
+                               presentation_.style),
+                    std::move(diagnostics), std::nullopt};
         }
         using Rows = std::vector<InterfaceOverview>;
         return {list(
@@ -48,6 +70,27 @@ class Execution {
                     },
                     [now](const Rows& rows) { return overviewJson(rows, now); }),
                 std::move(diagnostics), std::nullopt};
+    }
+
+    Outcome operator()(const DescribeCommand& command) const {
+        const cimom::ObjectPath path = readClassArgument(command.className, client_.nameSpace());
+        const cimom::ClassDeclaration* const declaration = client_.classes().find(path.className);
+        if (declaration == nullptr) {
+            Response response;
+            response.operation = "GetClass";
+            response.status = {CMPI_RC_ERR_INVALID_CLASS, ""};
+            throw explainedFailure({path, std::move(response)}, client_);
+        }
+        using Rows = std::vector<cimom::PropertyDeclaration>;
+        return {list(
+                    propertyColumns(*declaration), declaration->properties,
+                    [&](const Rows& rows, std::optional<std::size_t> width, const Style& style) {
+                        cimom::ClassDeclaration sorted = *declaration;
+                        sorted.properties = rows;
+                        return describeText(sorted, width, style);
+                    },
+                    [&](const Rows& rows) { return describeJson(*declaration, rows); }),
+                "", std::nullopt};
     }
 
     Outcome operator()(const ClassesCommand& /*command*/) const {
@@ -99,16 +142,22 @@ class Execution {
     template <typename Kind>
     Outcome operator()(const Kind& command) const {
         if constexpr (isOneOf<Kind, TreeCommand, ServeCommand, UserAddCommand, WatchCommand,
-                              ExporterCommand>) {
+                              ExporterCommand, CompleteCommand>) {
             throw Failure(ExitStatus::usage, "this command does not ask one server once");
         } else {
             CimOperation operation = cimdhcp::carryOut(command, client_);
+            if constexpr (isOneOf<Kind, AssociatorsCommand, ReferencesCommand>) {
+                // What the exact provider gives is looked at as it is.
+                if (!presentation_.exact) {
+                    refuseMissingSource(command, operation, client_);
+                }
+            }
             if (presentation_.sort) {
                 sortResponse(*presentation_.sort, operation.response);
             }
-            Outcome outcome{formatted(operation.response), "", std::nullopt};
+            Outcome outcome{formatted(operation.response, columnsFor(command)), "", std::nullopt};
             if (!operation.response.status.ok()) {
-                outcome.failure = client_.failure(operation.response, operation.path);
+                outcome.failure = explainedFailure(operation, client_);
             } else if (std::is_same_v<Kind, ModifyCommand> &&
                        presentation_.format == Format::table) {
                 outcome.text += "Modified.\n";
@@ -128,6 +177,15 @@ class Execution {
         if (presentation_.count) {
             return counted(rows.size());
         }
+        if (presentation_.tsv()) {
+            return tsvOf(
+                presentation_.columns.empty() ? columns : chosenOf(columns, presentation_.columns),
+                rows, presentation_.style.header);
+        }
+        if (!presentation_.columns.empty()) {
+            return tableOf(chosenOf(columns, presentation_.columns), rows)
+                .text(presentation_.width, presentation_.style);
+        }
         return presentation_.json() ? json(rows)
                                     : table(rows, presentation_.width, presentation_.style);
     }
@@ -137,17 +195,39 @@ class Execution {
                                     : std::to_string(number) + '\n';
     }
 
-    [[nodiscard]] std::string formatted(const Response& response) const {
+    /// The columns that were chosen; without any, a property list chooses them.
+    template <typename Kind>
+    [[nodiscard]] std::vector<std::string> columnsFor(const Kind& command) const {
+        std::vector<std::string> columns = presentation_.columns;
+        if constexpr (isOneOf<Kind, InstancesCommand, GetCommand>) {
+            if (columns.empty() && !command.properties.empty()) {
+                columns = command.properties;
+                columns.insert(columns.begin(), "PATH");
+            }
+        }
+        return columns;
+    }
+
+    [[nodiscard]] std::string formatted(const Response& response,
+                                        const std::vector<std::string>& columns) const {
         if (presentation_.count && response.status.ok()) {
             return counted(response.paths.size() + response.instances.size());
         }
         switch (presentation_.format) {
             case Format::json:
-                return asJson(response);
+                return asJson(response, presentation_.internals);
             case Format::mof:
                 return asMof(response, client_.classes());
+            case Format::tsv:
+                return response.status.ok()
+                           ? asTsv(response, client_.classes(), columns, presentation_.style.header)
+                           : std::string();
             case Format::table:
                 break;
+        }
+        if (!presentation_.columns.empty() && response.status.ok()) {
+            return asColumns(response, client_.classes(), presentation_.columns,
+                             presentation_.width, presentation_.style);
         }
         return asTable(response, client_.classes(), presentation_.width, presentation_.style);
     }

@@ -1,13 +1,20 @@
 #include "commands/FleetOutput.h"
 
+#include <fcntl.h>
+
 #include <algorithm>
+#include <cerrno>
 #include <cstdint>
+#include <filesystem>
 #include <ostream>
 #include <sstream>
+#include <system_error>
 
+#include "commands/MemoryFile.h"
 #include "text/DisplayText.h"
 #include "text/JsonText.h"
 #include "text/Times.h"
+#include "zrcommon/UniqueFd.h"
 
 namespace cimdhcp {
 
@@ -32,7 +39,8 @@ FleetOutput::FleetOutput(const std::vector<ServerUrl>& servers, Presentation pre
       showTime_(showTime),
       outputs_(outputs),
       errorStyle_(errorStyle),
-      progress_(outputs.err, outputs.errWidth, servers.size()) {
+      progress_(outputs.err, outputs.errWidth, servers.size()),
+      done_(servers.size()) {
     progress_.show(0, 0);
 }
 
@@ -81,6 +89,8 @@ void FleetOutput::show(ServerReport&& report) {
     }
     if (report.outcome.failure) {
         failures_.emplace_back(report.server, report.outcome.failure->what());
+    } else {
+        done_[report.server] = true;
     }
     progress_.show(arrived_, failures_.size());
 }
@@ -110,6 +120,44 @@ ExitStatus FleetOutput::finish(bool interrupted) {
         return ExitStatus::interrupted;
     }
     return failures_.empty() ? ExitStatus::ok : ExitStatus::notAllDone;
+}
+
+std::vector<ServerUrl> FleetOutput::notDone() const {
+    std::vector<ServerUrl> servers;
+    for (std::size_t server = 0; server < servers_.size(); ++server) {
+        if (!done_[server]) {
+            servers.push_back(servers_[server]);
+        }
+    }
+    return servers;
+}
+
+void writeServers(const std::string& file, const std::vector<ServerUrl>& servers) {
+    std::string text;
+    for (const ServerUrl& server : servers) {
+        text += server.given + '\n';
+    }
+    // What is not a file, such as a pipe, cannot be replaced.
+    std::error_code error;
+    const std::filesystem::file_type type = std::filesystem::status(file, error).type();
+    const bool replaced = type == std::filesystem::file_type::regular ||
+                          type == std::filesystem::file_type::not_found;
+    const std::string written = replaced ? file + ".new" : file;
+    constexpr mode_t readable = 0666;  // less what the umask takes away
+    try {
+        const ZR::UniqueFd fd{
+            ::open(written.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, readable)};
+        if (!fd) {
+            throw std::system_error(errno, std::generic_category());
+        }
+        writeWhole(fd.get(), text);
+        if (replaced) {
+            std::filesystem::rename(written, file);
+        }
+    } catch (const std::system_error& failed) {
+        throw Failure(ExitStatus::notLoaded,
+                      "--failed " + printable(file) + ": " + failed.code().message());
+    }
 }
 
 }  // namespace cimdhcp

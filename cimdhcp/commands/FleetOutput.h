@@ -33,6 +33,9 @@ class FleetOutput {
     /// how the program ends. Servers that have not reported count as not asked.
     ExitStatus finish(bool interrupted);
 
+    /// The servers that failed, and those that were not asked, in the order of the list.
+    [[nodiscard]] std::vector<ServerUrl> notDone() const;
+
   private:
     [[nodiscard]] std::string textOf(const ServerReport& report) const;
     [[nodiscard]] std::string jsonOf(const ServerReport& report) const;
@@ -45,8 +48,12 @@ class FleetOutput {
     Style errorStyle_;
     ProgressBar progress_;
     std::size_t arrived_ = 0;
+    std::vector<bool> done_;                                     ///< of each server
     std::vector<std::pair<std::size_t, std::string>> failures_;  ///< server and message
     std::vector<Said> diagnostics_;                              ///< of servers
 };
+
+/// Writes a file that --hosts reads, in one step; an empty one for no servers. Throws Failure.
+void writeServers(const std::string& file, const std::vector<ServerUrl>& servers);
 
 }  // namespace cimdhcp

@@ -102,6 +102,24 @@ std::string expiresCell(const Row& row, std::int64_t now) {
     return mayExpire(row, now) ? unknown : noCell;
 }
 
+/// A moment that does not depend on when it is read.
+std::string expiresValue(const Row& row, std::int64_t now) {
+    const auto end = endOf(row);
+    const bool never = end && *end >= static_cast<std::int64_t>(ZR::NodeLexicon::never);
+    return end && !never ? isoText(*end) : never ? "never" : mayExpire(row, now) ? unknown : "";
+}
+
+std::string serversValue(const Row& row) {
+    if (!row.servers) {
+        return unknown;
+    }
+    std::string joined;
+    for (const std::string& server : *row.servers) {
+        joined += (joined.empty() ? "" : ",") + server;
+    }
+    return joined;
+}
+
 std::string expiresOrder(const Row& row, std::int64_t now) {
     const auto end = endOf(row);
     return end ? std::to_string(*end) : expiresCell(row, now);
@@ -182,10 +200,18 @@ std::vector<std::string> namesOfProcessors(Client& client) {
 
 }  // namespace
 
+ServedInstances askServed(Client& client) {
+    return {client.instancesIn("QVXZR_DHCPProtocolEndpoint"),
+            client.instancesIn("QVXZR_DHCPRemoteServiceAccessPoint"),
+            client.instancesIn("QVXZR_DHCPSettingData")};
+}
+
 MachineInterfaces askMachine(Client& client, AskDiagnostics diagnostics) {
-    const ServedInstances served{client.instancesIn("QVXZR_DHCPProtocolEndpoint"),
-                                 client.instancesIn("QVXZR_DHCPRemoteServiceAccessPoint"),
-                                 client.instancesIn("QVXZR_DHCPSettingData")};
+    return askMachine(client, diagnostics, askServed(client));
+}
+
+MachineInterfaces askMachine(Client& client, AskDiagnostics diagnostics,
+                             const ServedInstances& served) {
     MachineInterfaces machine;
     using Instances = std::vector<cimom::Instance>;
     const auto interfaces = client.instancesIn("QVXZR_DHCPInterface");
@@ -214,16 +240,29 @@ MachineInterfaces askMachine(Client& client, AskDiagnostics diagnostics) {
 }
 
 std::vector<Column<InterfaceOverview>> overviewColumns(std::int64_t now) {
-    return {{"SYSTEM", [](const Row& row) { return row.system; }},
-            {"INTERFACE", [](const Row& row) { return cellOf(row.name); }},
-            {"DHCP", dhcpCell},
-            {"STATE", [now](const Row& row) { return std::string(wordOf(stateOf(row, now))); }},
-            {"CLIENT", [](const Row& row) { return cell(clientOf(row)); }},
-            {"ADDRESS", [now](const Row& row) { return cell(addressOf(row, now)); }},
-            {"EXPIRES", [now](const Row& row) { return expiresCell(row, now); },
-             [now](const Row& row) { return expiresOrder(row, now); }},
-            {"SERVERS", [](const Row& row) { return cell(row.servers); }},
-            {"CONFIGURATION NAME", [](const Row& row) { return cell(row.configurationName); }}};
+    return {{"SYSTEM", [](const Row& row) { return row.system; }, {}, {true, 0}},
+            {"INTERFACE", [](const Row& row) { return cellOf(row.name); }, {}, {true, 0}},
+            {"DHCP", dhcpCell, {}, {true, 1}},
+            {"STATE",
+             [now](const Row& row) { return std::string(wordOf(stateOf(row, now))); },
+             {},
+             {true, 0}},
+            {"CLIENT", [](const Row& row) { return cell(clientOf(row)); }, {}, {true, 5}},
+            {"ADDRESS", [now](const Row& row) { return cell(addressOf(row, now)); }, {}, {true, 0}},
+            {"EXPIRES",
+             [now](const Row& row) { return expiresCell(row, now); },
+             [now](const Row& row) { return expiresOrder(row, now); },
+             {true, 2},
+             [now](const Row& row) { return expiresValue(row, now); }},
+            {"SERVERS",
+             [](const Row& row) { return cell(row.servers); },
+             {},
+             {false, 3},
+             [](const Row& row) { return serversValue(row); }},
+            {"CONFIGURATION NAME",
+             [](const Row& row) { return cell(row.configurationName); },
+             {},
+             {false, 4}}};
 }
 
 std::string overviewTable(const std::vector<InterfaceOverview>& interfaces, std::int64_t now,
@@ -245,33 +284,36 @@ std::string overviewTable(const std::vector<InterfaceOverview>& interfaces, std:
            (noneUsesDhcp && style.header ? "No interface of this machine uses DHCP.\n" : "");
 }
 
+JsonMembers interfaceJson(const InterfaceOverview& interface, std::int64_t now) {
+    JsonList unknownKeys;
+    for (const Field& field : unknownFields(interface, now)) {
+        unknownKeys.push_back(std::string(field.key));
+    }
+    if (!interface.active) {
+        unknownKeys.push_back("link");
+    }
+    if (!interface.leases) {
+        unknownKeys.push_back("leases");
+    }
+    const auto& servers = interface.servers;
+    return {{"interface", interface.name},
+            {"system", interface.system},
+            {"dhcp", boolJson(interface.dhcp)},
+            {"state", stateJson(stateOf(interface, now))},
+            {"link", boolJson(interface.active)},
+            {"client", textJson(clientOf(interface))},
+            {"address", textJson(addressOf(interface, now))},
+            {"expires", momentJson(endOf(interface))},
+            {"servers", servers ? Json(JsonList(servers->begin(), servers->end())) : Json(nullptr)},
+            {"configurationName", textJson(interface.configurationName)},
+            {"leases", leasesJson(interface, now)},
+            {"unknown", std::move(unknownKeys)}};
+}
+
 std::string overviewJson(const std::vector<InterfaceOverview>& interfaces, std::int64_t now) {
     JsonList list;
     for (const InterfaceOverview& each : interfaces) {
-        JsonList unknownKeys;
-        for (const Field& field : unknownFields(each, now)) {
-            unknownKeys.push_back(std::string(field.key));
-        }
-        if (!each.active) {
-            unknownKeys.push_back("link");
-        }
-        if (!each.leases) {
-            unknownKeys.push_back("leases");
-        }
-        list.push_back(JsonMembers{
-            {"interface", each.name},
-            {"system", each.system},
-            {"dhcp", boolJson(each.dhcp)},
-            {"state", stateJson(stateOf(each, now))},
-            {"link", boolJson(each.active)},
-            {"client", textJson(clientOf(each))},
-            {"address", textJson(addressOf(each, now))},
-            {"expires", momentJson(endOf(each))},
-            {"servers", each.servers ? Json(JsonList(each.servers->begin(), each.servers->end()))
-                                     : Json(nullptr)},
-            {"configurationName", textJson(each.configurationName)},
-            {"leases", leasesJson(each, now)},
-            {"unknown", std::move(unknownKeys)}});
+        list.push_back(interfaceJson(each, now));
     }
     return jsonText(JsonMembers{{"interfaces", std::move(list)}});
 }

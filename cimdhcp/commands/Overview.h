@@ -8,6 +8,7 @@
 
 #include "client/MachineInterfaces.h"
 #include "text/Columns.h"
+#include "text/JsonText.h"
 #include "text/Style.h"
 
 namespace cimdhcp {
@@ -25,6 +26,11 @@ enum class AskDiagnostics : bool { No, Yes };
 /// that is neither OK nor says that the class is not served, and where neither kind of
 /// classes is served.
 [[nodiscard]] MachineInterfaces askMachine(Client& client, AskDiagnostics diagnostics);
+/// The same, where the DHCP classes of the standard have been asked for.
+[[nodiscard]] MachineInterfaces askMachine(Client& client, AskDiagnostics diagnostics,
+                                           const ServedInstances& served);
+/// What the provider tells by the DHCP classes of the standard.
+[[nodiscard]] ServedInstances askServed(Client& client);
 
 /// The interfaces as a table, with a line below it when none of them uses DHCP;
 /// that line alone when there are none. The system stands in a column of its own
@@ -42,6 +48,9 @@ enum class AskDiagnostics : bool { No, Yes };
 /// {"seconds", "time"}; "leases" has what DHCPLease nodes have, each with its state.
 [[nodiscard]] std::string overviewJson(const std::vector<InterfaceOverview>& interfaces,
                                        std::int64_t now);
+
+/// One of these interfaces.
+[[nodiscard]] JsonMembers interfaceJson(const InterfaceOverview& interface, std::int64_t now);
 
 /// Notes for standard error: what of the table nothing tells. Empty when all is known.
 [[nodiscard]] std::string unknownText(const std::vector<InterfaceOverview>& interfaces,

@@ -123,12 +123,19 @@ void setUpPlatform(const Options& options, std::ostream& err) {
     if (!settings.instrumentationTree.empty()) {
         checkTree(settings.instrumentationTree);
     }
-    // A directory that is missing is one without files. (The setting itself ends
-    // with a separator, which a file's name cannot.)
+    // The setting itself ends with a separator, which a file's name cannot.
     std::error_code error;
     if (options.dataDir && std::filesystem::exists(*options.dataDir, error) &&
         !std::filesystem::is_directory(*options.dataDir, error)) {
         throw Failure(ExitStatus::notLoaded, *options.dataDir + ": is not a directory");
+    }
+}
+
+void requireDataDirectory(const Options& options) {
+    std::error_code error;
+    if (options.dataDir && !std::filesystem::exists(*options.dataDir, error)) {
+        throw Failure(ExitStatus::notLoaded, "--data-dir " + printable(*options.dataDir) +
+                                                 ": there is no such directory; mkdir makes it");
     }
 }
 

@@ -22,6 +22,10 @@ namespace cimdhcp {
 /// when the tree is not a file of a JSON tree or the data directory is not a directory.
 void setUpPlatform(const Options& options, std::ostream& err);
 
+/// Throws Failure when --data-dir names a directory that is not there: what is likely a slip
+/// is neither taken for an empty directory nor made.
+void requireDataDirectory(const Options& options);
+
 /// What a person knows the tree by that setUpPlatform() handed over; empty: there is none.
 [[nodiscard]] const std::string& treeName();
 

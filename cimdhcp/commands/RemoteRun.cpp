@@ -7,6 +7,7 @@
 #include "commands/Interruption.h"
 #include "commands/ServerAccess.h"
 #include "text/DisplayText.h"
+#include "text/ProgressBar.h"
 
 namespace cimdhcp {
 
@@ -36,6 +37,8 @@ ExitStatus runRemotely(const CommandLine& line, const Presentation& presentation
     if (!several) {
         Outcome outcome;
         try {
+            const WaitingLine waiting(outputs.err, outputs.errWidth,
+                                      "waiting for " + printable(servers.front().given));
             outcome = ask(servers.front());
         } catch (const Failure& failure) {
             // A failure without a response of the server needs the server's name.
@@ -48,6 +51,10 @@ ExitStatus runRemotely(const CommandLine& line, const Presentation& presentation
         }
         outputs.out << outcome.text;
         outputs.err << outcome.diagnostics;
+        if (line.options.failed) {
+            writeServers(*line.options.failed,
+                         outcome.failure ? servers : std::vector<ServerUrl>());
+        }
         if (outcome.failure) {
             throw Failure(*outcome.failure);
         }
@@ -58,7 +65,11 @@ ExitStatus runRemotely(const CommandLine& line, const Presentation& presentation
         servers, line.options.parallel, ask,
         [&output](ServerReport&& report) { output.show(std::move(report)); },
         interruption.wanted());
-    return output.finish(interruption.wanted());
+    const ExitStatus status = output.finish(interruption.wanted());
+    if (line.options.failed) {
+        writeServers(*line.options.failed, output.notDone());
+    }
+    return status;
 }
 
 }  // namespace cimdhcp

@@ -1,8 +1,10 @@
 #include "commands/ServerAccess.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <cstring>
 #include <ostream>
+#include <unordered_set>
 #include <utility>
 
 #include "text/DisplayText.h"
@@ -43,17 +45,43 @@ HttpSettings ServerAccess::settingsFor(const ServerUrl& server) const {
     return settings;
 }
 
+namespace {
+
+/// Puts the server to the others, unless one of them is the same.
+class DistinctServers {
+  public:
+    void add(ServerUrl server) {
+        std::string place = server.text();
+        std::transform(place.begin(), place.end(), place.begin(), [](char letter) {
+            return letter >= 'A' && letter <= 'Z' ? static_cast<char>(letter - 'A' + 'a') : letter;
+        });
+        // Case counts in paths alone.
+        place += server.path;
+        if (known_.insert(std::move(place)).second) {
+            servers_.push_back(std::move(server));
+        }
+    }
+
+    std::vector<ServerUrl> take() { return std::move(servers_); }
+
+  private:
+    std::unordered_set<std::string> known_;
+    std::vector<ServerUrl> servers_;
+};
+
+}  // namespace
+
 std::vector<ServerUrl> serversOf(const Options& options) {
-    std::vector<ServerUrl> servers;
+    DistinctServers servers;
     for (const std::string& text : options.connect) {
-        servers.push_back(readServerUrl(text));
+        servers.add(readServerUrl(text));
     }
     if (options.hosts) {
         for (ServerUrl& server : readServersFile(*options.hosts)) {
-            servers.push_back(std::move(server));
+            servers.add(std::move(server));
         }
     }
-    return servers;
+    return servers.take();
 }
 
 void warnOfInsecurity(const Options& options, std::ostream& err) {

@@ -29,7 +29,8 @@ class ServerAccess {
     std::vector<Credential> credentials_;
 };
 
-/// Those of --connect, then those of --hosts. Throws Failure.
+/// Those of --connect, then those of --hosts, each once, however often it is named. Throws
+/// Failure.
 [[nodiscard]] std::vector<ServerUrl> serversOf(const Options& options);
 
 /// Writes what --insecure means, if it is given.

@@ -8,9 +8,9 @@ namespace cimdhcp {
 /// How the program ends.
 enum class ExitStatus : int {
     ok = 0,
-    notDone = 1,        ///< the CIM status is another than OK, or a rename was not possible
+    notDone = 1,        ///< the request was not fulfilled, or what it names does not exist
     usage = 2,          ///< the command line cannot be understood
-    notLoaded = 3,      ///< the provider or a file cannot be loaded, or the output not written
+    notLoaded = 3,      ///< what is needed cannot be loaded, reached, understood or written
     notAllDone = 4,     ///< some of several servers have failed
     interrupted = 130,  ///< as shells report the end by SIGINT
 };

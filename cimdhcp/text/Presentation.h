@@ -4,23 +4,28 @@
 #include <cstdint>
 #include <optional>
 #include <string>
+#include <vector>
 
 #include "text/Style.h"
 
 namespace cimdhcp {
 
-enum class Format : std::uint8_t { table, mof, json };
+enum class Format : std::uint8_t { table, tsv, mof, json };
 
 /// How results are shown.
 struct Presentation {
     Format format = Format::table;
     std::optional<std::size_t> width;  ///< columns to write in; none: as many as there are
     Style style;
-    std::optional<std::string> sort;  ///< by this column or property
-    bool comments = false;            ///< the output is in a language with "//" comments
-    bool count = false;               ///< the number of results alone
-    std::int64_t now = 0;             ///< what moments are told from; seconds since the epoch
+    std::optional<std::string> sort;   ///< by this column or property
+    std::vector<std::string> columns;  ///< of a table, in this order; none: all
+    bool internals = false;            ///< JSON has what helps to debug a provider
+    bool comments = false;             ///< the output is in a language with "//" comments
+    bool count = false;                ///< the number of results alone
+    bool exact = false;                ///< the results of the exact provider, as they are
+    std::int64_t now = 0;              ///< what moments are told from; seconds since the epoch
 
+    [[nodiscard]] bool tsv() const noexcept { return format == Format::tsv; }
     [[nodiscard]] bool json() const noexcept { return format == Format::json; }
 
     bool operator==(const Presentation&) const = default;

@@ -1,6 +1,11 @@
 #include "text/ProgressBar.h"
 
 #include <algorithm>
+#include <chrono>
+#include <system_error>
+#include <utility>
+
+#include "text/DisplayText.h"
 
 namespace cimdhcp {
 
@@ -53,6 +58,45 @@ void ProgressBar::hide() {
     if (shown_) {
         terminal_ << clearLine << std::flush;
         shown_ = false;
+    }
+}
+
+WaitingLine::WaitingLine(std::ostream& terminal, std::optional<std::size_t> width,
+                         std::string doing)
+    : terminal_(terminal),
+      room_(std::max<std::size_t>(width.value_or(2), 2) - 1),
+      doing_(std::move(doing)) {
+    if (width) {
+        try {
+            thread_ = std::thread([this] { run(); });
+        } catch (const std::system_error&) {
+            // The system has no more threads; it is done without the line, too.
+        }
+    }
+}
+
+WaitingLine::~WaitingLine() {
+    {
+        const std::lock_guard lock(mutex_);
+        ended_ = true;
+    }
+    changed_.notify_one();
+    if (thread_.joinable()) {
+        thread_.join();
+    }
+}
+
+void WaitingLine::run() {
+    std::unique_lock lock(mutex_);
+    for (unsigned seconds = 1;; ++seconds) {
+        if (changed_.wait_for(lock, std::chrono::seconds(1), [this] { return ended_; })) {
+            if (seconds > 1) {
+                terminal_ << clearLine << std::flush;
+            }
+            return;
+        }
+        terminal_ << clearLine << cutToWidth(doing_ + ", " + std::to_string(seconds) + " s", room_)
+                  << std::flush;
     }
 }
 

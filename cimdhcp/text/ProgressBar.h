@@ -1,9 +1,12 @@
 #pragma once
 
+#include <condition_variable>
 #include <cstddef>
+#include <mutex>
 #include <optional>
 #include <ostream>
 #include <string>
+#include <thread>
 
 namespace cimdhcp {
 
@@ -25,6 +28,30 @@ class ProgressBar {
     std::optional<std::size_t> width_;
     std::size_t total_;
     bool shown_ = false;
+};
+
+/// A line on a terminal that says how long something takes already, once it has taken a
+/// second. Without a width it shows nothing. While it exists, nothing else may be written to
+/// the stream.
+class WaitingLine {
+  public:
+    /// `doing` says what takes so long.
+    WaitingLine(std::ostream& terminal, std::optional<std::size_t> width, std::string doing);
+    /// Takes the line away.
+    ~WaitingLine();
+    WaitingLine(const WaitingLine&) = delete;
+    WaitingLine& operator=(const WaitingLine&) = delete;
+
+  private:
+    void run();
+
+    std::ostream& terminal_;
+    std::size_t room_;
+    std::string doing_;
+    std::mutex mutex_;
+    std::condition_variable changed_;
+    bool ended_ = false;
+    std::thread thread_;
 };
 
 /// "[=====>    ] 12 of 24, 1 failed", not wider than `width`; the numbers alone where

@@ -1,14 +1,13 @@
 #!/usr/bin/env bash
-# Compares the options that the program's help tells with those of its manual page and of
-# its completion: each knows all of them, and no other.
-# Usage: options.sh PROGRAM MANUAL_PAGE COMPLETION
+# Compares the options that the program's help tells with those of its manual page and those
+# that it offers to shells: each knows all of them, and no other.
+# Usage: options.sh PROGRAM MANUAL_PAGE
 set -euo pipefail
 
 program=$1
 manual=$2
-completion=$3
-commands=(show watch rename graph tree check classes names instances get modify associators
-    references serve "user add" profiles metrics exporter)
+commands=(show watch rename graph tree check classes names instances describe get modify
+    associators references serve "user add" profiles metrics exporter help)
 
 # Long options, one per line.
 options() { grep -oE -e '(^|[^a-zA-Z0-9-])--[a-z][a-z-]*[a-z]' | sed 's/^[^-]*//' | LC_ALL=C sort -u; }
@@ -33,15 +32,8 @@ for command in "${commands[@]}"; do
     own=$("$program" $command --help | grep -E '^ +-' | options)
     all+=$'\n'$own
     # What the shell completes behind the command.
-    completed=$(
-        # shellcheck source=/dev/null
-        source "$completion"
-        # shellcheck disable=SC2206
-        COMP_WORDS=("$program" $command --)
-        COMP_CWORD=$((${#COMP_WORDS[@]} - 1))
-        _cimdhcp
-        printf '%s\n' "${COMPREPLY[@]}" | options
-    )
+    # shellcheck disable=SC2086
+    completed=$("$program" complete $command -- | cut -f 1 | options)
     compare "completion of $command" "$(printf '%s\n%s\n' "$general" "$own" | LC_ALL=C sort -u)" \
         "$completed"
 done

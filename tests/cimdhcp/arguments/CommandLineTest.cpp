@@ -164,25 +164,94 @@ TEST_F(CommandLineText, ATreeMayBeExplained) {
 TEST_F(CommandLineText, TellsWhatIsWrong) {
     const std::string hint = " (\"cimdhcp --help\" tells more)";
     EXPECT_EQ(refusal({}), "a command is missing" + hint);
-    EXPECT_EQ(refusal({"server"}), "there is no command \"server\"" + hint);
+    EXPECT_EQ(refusal({"server"}), "there is no command \"server\"; did you mean serve?" + hint);
     EXPECT_NE(refusal({"user"}), "accepted");
     EXPECT_NE(refusal({"user", "add", "ada"}), "accepted");
     EXPECT_NE(refusal({"serve", "--max-body", "-1"}), "accepted");
     EXPECT_EQ(refusal({"serve", "--max-body", "0"}), "--max-body is 0; it may be 1 to 1073741824");
     EXPECT_NE(refusal({"serve", "--request-timeout", "x"}), "accepted");
-    EXPECT_EQ(refusal({"show", "eth0"}), "The following argument was not expected: eth0" + hint);
-    EXPECT_EQ(refusal({"--nothing", "x", "show"}).substr(0, 37),
-              "The following arguments were not expe");
+    EXPECT_EQ(refusal({"classes", "b", "a"}), "arguments too many: \"b\", \"a\"" + hint);
+    EXPECT_EQ(refusal({"get", "P", "x"}), "one argument too many: \"x\"" + hint);
+    EXPECT_EQ(refusal({"get", "1", "2", "3", "4", "5", "6", "7"}),
+              "arguments too many: \"2\", \"3\", \"4\", \"5\" and 2 more" + hint);
+    EXPECT_EQ(refusal({"get", "P", std::string(100, 'x')}),
+              "one argument too many: \"" + std::string(59, 'x') + "…\"" + hint);
+    EXPECT_EQ(refusal({"--nothing", "x", "show"}), "there is no option \"--nothing\"" + hint);
+    EXPECT_EQ(refusal({"show", "--colums", "a"}),
+              "there is no option \"--colums\"; did you mean --columns?" + hint);
+    EXPECT_EQ(refusal({"serve", "--reed-only"}),
+              "there is no option \"--reed-only\"; did you mean --read-only?" + hint);
+    EXPECT_EQ(refusal({"shwo"}), "there is no command \"shwo\"; did you mean show?" + hint);
+    EXPECT_EQ(refusal({"--columns", "a,,b", "show"}),
+              "--columns: a name is empty in \"a,,b\"" + hint);
+    EXPECT_EQ(refusal({"--columns", "", "show"}), "--columns: it needs a name" + hint);
+    EXPECT_EQ(refusal({"--columns", "a", "check"}),
+              "the result of this command has no columns to choose from");
+    EXPECT_EQ(refusal({"--columns", "a", "--format", "json", "show"}),
+              "--columns is for --format table and tsv");
+    EXPECT_EQ(refusal({"--format", "tsv", "rename", "a", "b"}),
+              "the result of this command has no columns: it has no tsv output");
+    EXPECT_EQ(refusal({"--failed", "f", "show"}),
+              "--failed gets servers that failed; name them with --connect or --hosts");
     EXPECT_EQ(refusal({"rename", "eth0"}), "NAME is required" + hint);
     EXPECT_EQ(refusal({"modify", "P"}), "PROPERTY=VALUE is required" + hint);
     EXPECT_EQ(refusal({"--format", "xml", "show"}),
-              "--format: there is no format \"xml\", only table, mof and json" + hint);
-    EXPECT_EQ(refusal({"references", "P", "--assoc-class", "A"}).substr(0, 30),
-              "The following arguments were n");
+              "--format: there is no format \"xml\", only table, tsv, mof and json" + hint);
+    EXPECT_EQ(refusal({"references", "P", "--assoc-class", "A"}),
+              "there is no option \"--assoc-class\"" + hint);
     EXPECT_EQ(refusal({"--namespace", "/", "show"}),
               "--namespace needs a name, such as root/cimv2");
     EXPECT_EQ(refusal({"--tree", "", "show"}), "--tree needs a name");
     EXPECT_EQ(refusal({"--data-dir", "", "show"}), "--data-dir needs a name");
+}
+
+TEST_F(CommandLineText, ReadsWhatIsLookedAtAndHow) {
+    EXPECT_EQ(line({"show", "eth0", "BMC%eth1"}).command,
+              Command(ShowCommand{{"eth0", "BMC%eth1"}}));
+    EXPECT_EQ(line({"describe", "C"}).command, Command(DescribeCommand{"C"}));
+    EXPECT_EQ(line({"instances", "C", "--properties", "A, B,", "--properties=D"}).command,
+              Command(InstancesCommand{"C", {"A", "B", "D"}}));
+    EXPECT_EQ(line({"get", "P", "--properties", "A"}).command, Command(GetCommand{"P", {"A"}}));
+    Options options;
+    options.format = Format::tsv;
+    options.table.columns = {"state", "address"};
+    options.table.wide = options.debug = true;
+    options.connect = {"h"};
+    options.failed = "f";
+    EXPECT_EQ(line({"--format", "tsv", "--columns", "state,address", "--wide", "--debug",
+                    "--connect", "h", "--failed", "f", "show"}),
+              (CommandLine{options, ShowCommand{}}));
+}
+
+TEST_F(CommandLineText, ExplainsAsACommandToo) {
+    EXPECT_EQ(information({"help"}), information({"--help"}));
+    EXPECT_EQ(information({"help", "show"}), information({"show", "--help"}));
+    EXPECT_EQ(information({"help", "user", "add"}), information({"user", "add", "--help"}));
+    EXPECT_EQ(information({"-V"}), information({"--version"}));
+    const std::string hint = " (\"cimdhcp --help\" tells more)";
+    EXPECT_EQ(refusal({"help", "shw"}), "there is no command \"shw\"; did you mean show?" + hint);
+    EXPECT_EQ(refusal({"help", "show", "eth0"}), "one argument too many: \"eth0\"" + hint);
+}
+
+TEST_F(CommandLineText, LeavesWhatAShellCompletesUnread) {
+    EXPECT_EQ(line({"complete", "--nothing", "shwo", "--help"}).command,
+              Command(CompleteCommand{{"--nothing", "shwo", "--help"}}));
+    EXPECT_EQ(information({"--help"}).find("complete "), std::string::npos);
+    CommandLineReader reader;
+    const UnfinishedLine unfinished = reader.readUnfinished(
+        {"--connect", "h", "--no-header", "get", "--insecure", "P", "--properties=A,B"});
+    EXPECT_EQ(unfinished.wanted, UnfinishedLine::Wanted::property);
+    EXPECT_EQ(unfinished.fixed, "--properties=A,");
+    EXPECT_EQ(unfinished.begun, "B");
+    EXPECT_EQ(unfinished.command, "get");
+    EXPECT_EQ(unfinished.operands, std::vector<std::string>{"P"});
+    ASSERT_TRUE(unfinished.options);
+    EXPECT_EQ(unfinished.options->connect, std::vector<std::string>{"h"});
+    EXPECT_TRUE(unfinished.options->insecure);
+    EXPECT_FALSE(reader.readUnfinished({"--timeout", "x", "show", ""}).options);
+    EXPECT_EQ(reader.readUnfinished({}).wanted, UnfinishedLine::Wanted::words);
+    EXPECT_EQ(reader.readUnfinished({"get", "--", "--"}).wanted, UnfinishedLine::Wanted::path);
+    EXPECT_EQ(reader.readUnfinished({"classes", "x"}).wanted, UnfinishedLine::Wanted::nothing);
 }
 
 TEST_F(CommandLineText, HasMofForInstancesAlone) {

@@ -103,7 +103,7 @@ TEST(OptionRules, AnAddressInBracketsKeepsThem) {
 
 TEST(OptionRules, SaysHowTheResultIsShown) {
     Options options;
-    options.noHeader = true;
+    options.table.noHeader = true;
     options.sort = "STATE";
     options.count = true;
     options.time = true;

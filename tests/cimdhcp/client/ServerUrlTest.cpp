@@ -109,6 +109,7 @@ TEST(Servers, MistakesAreToldWithTheirLine) {
             static_cast<void>(readServers(lines, "hosts"));
             return std::string("accepted");
         } catch (const Failure& failure) {
+            EXPECT_EQ(failure.status(), ExitStatus::notLoaded);
             return std::string(failure.what());
         }
     };

@@ -1,4 +1,4 @@
-#include "commands/Findings.h"
+#include "commands/check/Findings.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>

@@ -4,7 +4,7 @@
 #include <nlohmann/json.hpp>
 
 #include "commands/DiagnosticText.h"
-#include "commands/Findings.h"
+#include "commands/check/Findings.h"
 
 namespace cimdhcp {
 namespace {

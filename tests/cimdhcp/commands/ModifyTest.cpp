@@ -6,7 +6,7 @@
 #include "cimom/ClassDeclaration.h"
 #include "client/ClassLookup.h"
 #include "client/Client.h"
-#include "commands/CimOperations.h"
+#include "commands/classes/CimOperations.h"
 #include "text/Failure.h"
 
 namespace cimdhcp {

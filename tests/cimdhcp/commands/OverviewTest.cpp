@@ -108,8 +108,10 @@ TEST(Overview, SaysThatThereAreNoInterfaces) {
 
 TEST(Overview, FitsATerminal) {
     EXPECT_EQ(overviewTable({bound()}, moment, 80),
-              "INTERFACE  DHCP  STATE  CLIENT    ADDRESS     EXPIRES  SERVERS      CONFIGURATI…\n"
-              "eth0       on    bound  dhclient  192.0.2.17  in 4 h   192.0.2.1,…  office\n");
+              "INTERFACE  DHCP  STATE  ADDRESS     EXPIRES  SERVERS      CONFIGURATION NAME\n"
+              "eth0       on    bound  192.0.2.17  in 4 h   192.0.2.1,   office\n"
+              "                                             2001:db8::1\n"
+              "(without CLIENT: --wide shows all)\n");
 }
 
 TEST(Overview, HeadingsAreStrongWhereThereAreColors) {

@@ -8,8 +8,8 @@
 #include <csignal>
 #include <filesystem>
 
-#include "commands/RenameFiles.h"
-#include "commands/RenameRefusals.h"
+#include "commands/rename/RenameFiles.h"
+#include "commands/rename/RenameRefusals.h"
 #include "kit/ChildProcess.h"
 #include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"

@@ -5,8 +5,8 @@
 #include "cimom/Instance.h"
 #include "cimom/ObjectPathText.h"
 #include "client/Response.h"
-#include "commands/ClassTable.h"
-#include "commands/ResponseText.h"
+#include "commands/classes/ClassTable.h"
+#include "commands/classes/ResponseText.h"
 #include "kit/SmallSchema.h"
 #include "text/Failure.h"
 

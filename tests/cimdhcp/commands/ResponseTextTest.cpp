@@ -9,7 +9,7 @@
 #include "cimom/ObjectPathText.h"
 #include "cimom/Status.h"
 #include "client/Response.h"
-#include "commands/ResponseText.h"
+#include "commands/classes/ResponseText.h"
 #include "kit/SmallSchema.h"
 
 namespace cimdhcp {
@@ -26,14 +26,15 @@ ParsedJson valueIn(const Value& value) {
     cimom::Instance instance;
     instance.path.className = "TEST_Thing";
     instance.properties.push_back({"P", value});
-    const ParsedJson document = ParsedJson::parse(asJson({"GetInstance", {}, 0, {}, {instance}}));
+    const ParsedJson document =
+        ParsedJson::parse(asJson({"GetInstance", {}, 0, {}, {instance}}, false));
     return document["instances"][0]["properties"]["P"];
 }
 
 TEST(ResponseJson, HasAllPartsInTheirOrder) {
     Response response{"EnumerateInstanceNames", {}, 1, {}, {}};
     response.paths = {cimom::parseObjectPath("root/cimv2:TEST_Base.Id=\"a\""), std::nullopt};
-    EXPECT_EQ(asJson(response), R"({
+    EXPECT_EQ(asJson(response, true), R"({
   "operation": "EnumerateInstanceNames",
   "status": {
     "code": 0,
@@ -50,8 +51,12 @@ TEST(ResponseJson, HasAllPartsInTheirOrder) {
 }
 
 TEST(ResponseJson, AServerDoesNotTellAboutItsProvider) {
-    EXPECT_NE(asJson({"GetInstance", {}, std::nullopt, {}, {}}).find("\"returnDone\": null"),
+    EXPECT_NE(asJson({"GetInstance", {}, std::nullopt, {}, {}}, true).find("\"returnDone\": null"),
               std::string::npos);
+}
+
+TEST(ResponseJson, HasNothingOfTheProviderUnlessAskedFor) {
+    EXPECT_EQ(asJson({"GetInstance", {}, 1, {}, {}}, false).find("returnDone"), std::string::npos);
 }
 
 TEST(ResponseJson, HasInstancesWithTheirProperties) {
@@ -60,7 +65,7 @@ TEST(ResponseJson, HasInstancesWithTheirProperties) {
     instance.properties = {{"Id", Value::ofString("a")},
                            {"Options", {Type::uint16, true, Array{std::uint64_t{8}, Scalar()}}},
                            {"State", Value::null(Type::sint32, false)}};
-    EXPECT_EQ(asJson({"EnumerateInstances", {}, 0, {}, {instance, std::nullopt}}), R"({
+    EXPECT_EQ(asJson({"EnumerateInstances", {}, 0, {}, {instance, std::nullopt}}, true), R"({
   "operation": "EnumerateInstances",
   "status": {
     "code": 0,
@@ -98,7 +103,7 @@ TEST(ResponseJson, HasInstancesWithTheirProperties) {
 
 TEST(ResponseJson, NamesTheStatus) {
     const Response response{"GetInstance", {CMPI_RC_ERR_NOT_FOUND, "words"}, 0, {}, {}};
-    EXPECT_EQ(ParsedJson::parse(asJson(response))["status"],
+    EXPECT_EQ(ParsedJson::parse(asJson(response, false))["status"],
               ParsedJson({{"code", 6}, {"name", "CIM_ERR_NOT_FOUND"}}));
 }
 

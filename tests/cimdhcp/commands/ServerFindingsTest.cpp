@@ -1,5 +1,5 @@
 // What is told of an object manager whose responses are wrong in one way at a time.
-#include "commands/Findings.h"
+#include "commands/check/Findings.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>

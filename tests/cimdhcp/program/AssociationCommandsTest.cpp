@@ -95,11 +95,39 @@ TEST_F(AssociationCommands, ReferencesFollowsItsFilters) {
     EXPECT_EQ(run({"references", "--names", "--role", "ManagedElement", capabilities}), nothing_);
 }
 
-TEST_F(AssociationCommands, AnInstanceThatIsNotThereHasNone) {
-    EXPECT_EQ(run({"associators", "--names", "QVXZR_DHCPProtocolEndpoint.Name=\"eth7\"",
-                   "--assoc-class", "QVXZR_DHCPElementCapabilities"})
-                  .out,
-              "");
+TEST_F(AssociationCommands, AnInstanceThatIsNotThereIsAnError) {
+    const std::string gone = "QVXZR_DHCPCapabilities.InstanceID=\"eth7\"";
+    for (const char* command : {"associators", "references"}) {
+        EXPECT_EQ(run({command, "--names", gone}),
+                  (Ended{1, "",
+                         "cimdhcp: CIM_ERR_NOT_FOUND: there is no " + gone +
+                             "; \"cimdhcp names QVXZR_DHCPCapabilities\" lists what there is\n"}));
+    }
+}
+
+TEST_F(AssociationCommands, WhatNoAssociationHasIsAnError) {
+    const auto refusal = [this](const std::vector<std::string>& filter) {
+        std::vector<std::string> arguments{"associators", capabilities};
+        arguments.insert(arguments.end(), filter.begin(), filter.end());
+        const Ended ended = run(arguments);
+        EXPECT_EQ(ended.status, 1);
+        EXPECT_EQ(ended.out, "");
+        return ended.err;
+    };
+    const std::string invalid = "cimdhcp: CIM_ERR_INVALID_PARAMETER: ";
+    EXPECT_EQ(refusal({"--role", "Capabilties"}),
+              invalid +
+                  "no association has a reference \"Capabilties\"; did you mean "
+                  "Capabilities?\n");
+    EXPECT_EQ(
+        refusal({"--result-role", "Nothing", "--assoc-class", "QVXZR_DHCPElementCapabilities"}),
+        invalid + "QVXZR_DHCPElementCapabilities has no reference \"Nothing\"\n");
+    EXPECT_EQ(refusal({"--result-class", "QVXZR_DHCPCapabilites"}),
+              invalid +
+                  "there is no class \"QVXZR_DHCPCapabilites\"; did you mean "
+                  "QVXZR_DHCPCapabilities?\n");
+    // Of another class than the result, and of what does not lead there: nothing.
+    EXPECT_EQ(run({"references", "--names", capabilities, "--role", "dependent"}), nothing_);
 }
 
 TEST_F(AssociationCommands, AnUnknownClassIsAnError) {

@@ -1,6 +1,7 @@
 #include <gtest/gtest.h>
 
 #include <nlohmann/json.hpp>
+#include <sstream>
 
 #include "ProgramRun.h"
 
@@ -31,7 +32,6 @@ TEST_F(InstanceCommands, NamesAsMofAndJson) {
     "code": 0,
     "name": "OK"
   },
-  "returnDone": 1,
   "paths": [
     "root/cimv2:QVXZR_DHCPCapabilities.InstanceID=\"eth0\""
   ],
@@ -113,7 +113,6 @@ TEST_F(InstanceCommands, InstancesAsJson) {
     "code": 0,
     "name": "OK"
   },
-  "returnDone": 1,
   "paths": [],
   "instances": [
     {
@@ -184,11 +183,100 @@ TEST_F(InstanceCommands, ErrorsAreInTheJsonToo) {
     "code": 6,
     "name": "CIM_ERR_NOT_FOUND"
   },
-  "returnDone": 0,
   "paths": [],
   "instances": []
 }
 )");
+}
+
+TEST_F(InstanceCommands, PropertyListsLeaveTheRestOut) {
+    EXPECT_EQ(run({"instances", "QVXZR_DHCPCapabilities", "--properties",
+                   "maxelementnamelen,InstanceID"}),
+              (Ended{0,
+                     "root/cimv2:QVXZR_DHCPCapabilities.InstanceID=\"eth0\"\n"
+                     "  MaxElementNameLen = 15\n"
+                     "  InstanceID        = \"eth0\"\n",
+                     ""}));
+    EXPECT_EQ(run({"--format", "mof", "get", "QVXZR_DHCPCapabilities.InstanceID=\"eth0\"",
+                   "--properties", "ElementName"})
+                  .out,
+              "instance of QVXZR_DHCPCapabilities {\n"
+              "    ElementName = \"eth0\";\n"
+              "};\n");
+    EXPECT_EQ(run({"instances", "QVXZR_DHCPCapabilities", "--properties", "ElementNames"}),
+              (Ended{1, "",
+                     "cimdhcp: CIM_ERR_NO_SUCH_PROPERTY: QVXZR_DHCPCapabilities has no property "
+                     "\"ElementNames\"; did you mean ElementName?\n"}));
+    // What a subclass alone has.
+    EXPECT_EQ(run({"instances", "CIM_Capabilities", "--properties", "OptionsSupported"}).status, 0);
+}
+
+TEST_F(InstanceCommands, HaveColumns) {
+    EXPECT_EQ(run({"--format", "tsv", "instances", "QVXZR_DHCPCapabilities", "--properties",
+                   "OptionsSupported,Caption,ElementNameEditSupported"}),
+              (Ended{0,
+                     "PATH\tOptionsSupported\tCaption\tElementNameEditSupported\n"
+                     "root/cimv2:QVXZR_DHCPCapabilities.InstanceID=\"eth0\"\t{8, 14, 17}\t\t"
+                     "FALSE\n",
+                     ""}));
+    EXPECT_EQ(run({"instances", "QVXZR_DHCPSettingData", "--columns",
+                   "elementname,AddressOrigin,ConfigurationName"}),
+              (Ended{0,
+                     "ElementName  AddressOrigin  ConfigurationName\n"
+                     "eth0         4 (DHCP)       -\n"
+                     "eth1         4 (DHCP)       -\n",
+                     ""}));
+    EXPECT_EQ(run({"--format", "tsv", "--no-header", "names", "QVXZR_DHCPCapabilities"}).out,
+              "root/cimv2:QVXZR_DHCPCapabilities.InstanceID=\"eth0\"\n");
+    EXPECT_EQ(run({"instances", "QVXZR_DHCPSettingData", "--columns", "Colour"}).status, 2);
+}
+
+TEST_F(InstanceCommands, DescribeTellsWhatTheSchemaDoes) {
+    const Ended text = run({"describe", "qvxzr_dhcpsettingdata"});
+    EXPECT_EQ(text.status, 0);
+    EXPECT_EQ(text.out.substr(0, text.out.find('\n')),
+              "class QVXZR_DHCPSettingData : CIM_DHCPSettingData");
+    EXPECT_NE(text.out.find("\n    InstanceID  string, key\n"), std::string::npos);
+    EXPECT_NE(text.out.find("\n    ConfigurationName  string, writable\n"), std::string::npos);
+    EXPECT_NE(text.out.find("4 (DHCP)"), std::string::npos);
+    EXPECT_EQ(
+        run({"describe", "QVXZR_DHCPCapabilities", "--count"}).out,
+        std::to_string(nlohmann::json::parse(
+                           run({"describe", "QVXZR_DHCPCapabilities", "--format", "json"}).out)
+                           .at("properties")
+                           .size()) +
+            "\n");
+    EXPECT_EQ(run({"--format", "tsv", "describe", "QVXZR_DHCPElementCapabilities", "--columns",
+                   "property,type,key,writable"})
+                  .out,
+              "PROPERTY\tTYPE\tKEY\tWRITABLE\n"
+              "ManagedElement\tQVXZR_DHCPProtocolEndpoint REF\tyes\t\n"
+              "Capabilities\tQVXZR_DHCPCapabilities REF\tyes\t\n"
+              "Characteristics\tuint16[]\t\t\n");
+    EXPECT_EQ(
+        run({"describe", "QVXZR_DHCPLeese"}),
+        (Ended{1, "",
+               "cimdhcp: CIM_ERR_INVALID_CLASS: GetClass of QVXZR_DHCPLeese: the class is not "
+               "served; \"cimdhcp classes\" lists what is; did you mean QVXZR_DHCPLease?\n"}));
+}
+
+TEST_F(InstanceCommands, TellWhichKeysThereAre) {
+    EXPECT_EQ(run({"get", "QVXZR_DHCPCapabilities.Name=\"eth0\""}),
+              (Ended{1, "",
+                     "cimdhcp: CIM_ERR_INVALID_PARAMETER: the key InstanceID of "
+                     "QVXZR_DHCPCapabilities is missing; QVXZR_DHCPCapabilities has the key "
+                     "InstanceID\n"}));
+}
+
+TEST_F(InstanceCommands, TableOfClassesKeepsNamesWholeOnATerminal) {
+    const Ended ended = runOnTerminal(80, {"--color", "never", "classes"});
+    const Ended whole = run({"--no-header", "classes"});
+    std::istringstream lines(whole.out);
+    for (std::string name; lines >> name; std::getline(lines, name)) {
+        EXPECT_NE(ended.out.find("\n" + name + ' '), std::string::npos) << name;
+    }
+    EXPECT_NE(ended.out.find("\n(without PROVIDER"), std::string::npos);
+    EXPECT_EQ(ended.out.find("…"), std::string::npos);
 }
 
 TEST_F(InstanceCommands, UnknownClassesAndNamespacesAreErrors) {

@@ -184,12 +184,34 @@ TEST_F(ManyServers, GarbageIsAFailureOfItsServer) {
 
 TEST_F(ManyServers, AListThatCannotBeReadIsNotTheFailureOfAServer) {
     EXPECT_EQ(runAs(program(), {"--hosts", hostsFile({"a", "ftp://b"}), "show"}),
-              (Ended{2, "",
+              (Ended{3, "",
                      "cimdhcp: " + (directory() / "hosts") +
                          ": line 3: \"ftp://b\": only http:// and https:// are spoken\n"}));
     EXPECT_EQ(runAs(program(), {"--hosts", directory() / "none", "show"}).status, 3);
-    EXPECT_EQ(runAs(program(), {"--hosts", hostsFile({}), "show"}).status, 2);
+    EXPECT_EQ(runAs(program(), {"--hosts", hostsFile({}), "show"}).status, 3);
     EXPECT_EQ(runAs(program(), {"--connect", "a", "--connect", "b", "graph", "--svg"}).status, 2);
+}
+
+TEST_F(ManyServers, EachIsAskedOnceAndThoseThatFailedCanBeAskedAgain) {
+    serve(1);
+    const std::string gone = "http://127.0.0.1:1";
+    const std::string url = servers_[0]->url();
+    std::string shouted = url;
+    shouted.replace(0, 4, "HTTP");
+    const std::string failed = directory() / "failed";
+    const Ended first = runAs(program(), {"--hosts", hostsFile({url, gone, shouted, url}),
+                                          "--failed", failed, "--count", "show"});
+    EXPECT_EQ(first.status, 4);
+    EXPECT_EQ(first.out, url + "\t1\n");
+    EXPECT_THAT(first.err, HasSubstr("1 of 2 servers failed"));
+    EXPECT_EQ(ZR::Testing::readFile(failed), gone + '\n');
+    EXPECT_EQ(runAs(program(), {"--hosts", failed, "--failed", failed, "show"}).status, 4);
+    EXPECT_EQ(ZR::Testing::readFile(failed), gone + '\n');
+    EXPECT_EQ(runAs(program(), {"--connect", url, "--failed", failed, "show"}).status, 0);
+    EXPECT_EQ(ZR::Testing::readFile(failed), "");
+    EXPECT_EQ(
+        runAs(program(), {"--connect", url, "--failed", directory() / "no/such", "show"}).status,
+        3);
 }
 
 TEST_F(ManyServers, AnInterruptionEndsItWithASum) {

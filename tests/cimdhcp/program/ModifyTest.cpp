@@ -29,7 +29,6 @@ TEST_F(Modify, IsQuietInOtherFormats) {
     "code": 0,
     "name": "OK"
   },
-  "returnDone": 1,
   "paths": [],
   "instances": []
 }

@@ -11,6 +11,8 @@
 namespace {
 
 using test::Ended;
+using testing::HasSubstr;
+using testing::Not;
 using testing::StartsWith;
 
 class OverviewCommands : public test::ProgramTest {};
@@ -28,15 +30,18 @@ TEST_F(OverviewCommands, ShowListsTheInterfaces) {
                      ""}));
 }
 
-TEST_F(OverviewCommands, ShowCutsItsTableOnATerminalOnly) {
+TEST_F(OverviewCommands, ShowFitsATerminalUnlessToldOtherwise) {
     writeConfiguration("eth0", "CONFIG_NAME=office\n");
-    EXPECT_EQ(runOnTerminal(80, {"--color", "never", "show"}),
-              (Ended{0,
-                     "INTERFACE  DHCP  STATE  CLIENT    ADDRESS      EXPIRES  SERVERS      "
-                     "CONFIGURAT…\n"
-                     "eth0       on    bound  dhclient  192.0.2.17   never    192.0.2.1,…  office\n"
-                     "eth1       off   off    -         198.51.100…  -        -            -\n",
-                     ""}));
+    EXPECT_EQ(
+        runOnTerminal(80, {"--color", "never", "show"}),
+        (Ended{0,
+               "INTERFACE  DHCP  STATE  ADDRESS       EXPIRES  SERVERS      CONFIGURATION NAME\n"
+               "eth0       on    bound  192.0.2.17    never    192.0.2.1,   office\n"
+               "                                               2001:db8::1\n"
+               "eth1       off   off    198.51.100.4  -        -            -\n"
+               "(without CLIENT: --wide shows all)\n",
+               ""}));
+    EXPECT_EQ(runOnTerminal(80, {"--color", "never", "--wide", "show"}), run({"show"}));
     EXPECT_EQ(run({"show"}, {{"COLUMNS", "60"}}), run({"show"}));
 }
 
@@ -124,6 +129,51 @@ TEST_F(OverviewCommands, ColorsAreForTerminals) {
     EXPECT_THAT(runOnTerminal(100, {"show"}, {{"NO_COLOR", "1"}}).out, StartsWith("INTERFACE"));
     EXPECT_THAT(run({"show"}).out, StartsWith("INTERFACE"));
     EXPECT_THAT(run({"show", "--color", "always"}, {{"NO_COLOR", "1"}}).out, StartsWith(bold));
+}
+
+TEST_F(OverviewCommands, ShowTellsOneInterfaceInDetail) {
+    writeConfiguration("eth0", "CONFIG_NAME=office\n");
+    const Ended ended = run({"show", "eth0"});
+    EXPECT_EQ(ended.status, 0);
+    EXPECT_EQ(ended.err, "");
+    for (const char* text :
+         {"  DHCP:               on\n", "  State:              bound (there is a lease)\n",
+          "  Address:            192.0.2.17 (by DHCP)\n",
+          "  Servers:            192.0.2.1, 2001:db8::1\n", "  Configuration name: office\n",
+          "\n  Lease, IPv4\n", "    Expires:           never\n", "    Client:            dhclient",
+          "\n  DHCP endpoint\n", "ClientState             = 8 (Bound)\n", "\n  DHCP server\n",
+          "AccessContext           = 7 (SMTP Server)\n",
+          "\"7 (SMTP Server)\" is what the class holds for one)\n", "\n  Setting\n"}) {
+        EXPECT_THAT(ended.out, HasSubstr(text));
+    }
+    EXPECT_THAT(ended.out, StartsWith("eth0\n"));
+    EXPECT_THAT(ended.out, Not(HasSubstr("eth1")));
+    const Ended both = run({"show", "eth1", "Computer%eth0"});
+    EXPECT_THAT(both.out, StartsWith("eth1\n"));
+    EXPECT_THAT(both.out, HasSubstr("\n\neth0\n"));
+    const auto json = nlohmann::json::parse(run({"--format", "json", "show", "eth1"}).out);
+    ASSERT_EQ(json.at("interfaces").size(), 1U);
+    EXPECT_EQ(json["interfaces"][0]["interface"], "eth1");
+    EXPECT_EQ(json["interfaces"][0]["endpoint"], nullptr);
+    EXPECT_EQ(json["interfaces"][0]["setting"]["class"], "QVXZR_DHCPSettingData");
+    EXPECT_EQ(
+        run({"show", "eth7"}),
+        (Ended{1, "", "cimdhcp: there is no interface \"eth7\"; this machine has: eth0, eth1\n"}));
+}
+
+TEST_F(OverviewCommands, ShowHasColumnsForProgramsAndPeople) {
+    EXPECT_EQ(run({"show", "--format", "tsv", "--columns", "interface,dhcp,servers,client"}),
+              (Ended{0,
+                     "INTERFACE\tDHCP\tSERVERS\tCLIENT\n"
+                     "eth0\ton\t192.0.2.1,2001:db8::1\tdhclient\n"
+                     "eth1\toff\t\t\n",
+                     ""}));
+    EXPECT_EQ(run({"show", "eth1", "--columns", "state,interface", "--no-header"}),
+              (Ended{0, "off  eth1\n", ""}));
+    EXPECT_EQ(
+        run({"show", "--columns", "stat"}).err,
+        "cimdhcp: --columns: there is no column \"stat\"; there are: SYSTEM, INTERFACE, DHCP, "
+        "STATE, CLIENT, ADDRESS, EXPIRES, SERVERS, CONFIGURATION NAME; did you mean STATE?\n");
 }
 
 TEST_F(OverviewCommands, RowsAreSortedAndCounted) {

@@ -67,7 +67,9 @@ TEST_F(Rename, MakesTheFileWhenAsked) {
 
 TEST_F(Rename, MakesTheDirectoryToo) {
     fs::remove(dataDir());
-    EXPECT_EQ(run({"rename", "eth0", "office", "--create"}),
+    // The one that is set, not one that is named on the command line.
+    EXPECT_EQ(runAs(program(), {"--tree", tree(), "rename", "eth0", "office", "--create"},
+                    {{"ZR_DATA_DIR", dataDir()}}),
               (Ended{0,
                      "Made the directory " + dataDir() +
                          "/.\n"

@@ -35,7 +35,9 @@ TEST_F(Usage, HelpIsPrintedAndFitsATerminal) {
 TEST_F(Usage, MistakesAreStatusTwo) {
     const std::string hint = " (\"cimdhcp --help\" tells more)\n";
     EXPECT_EQ(plain({}), (Ended{2, "", "cimdhcp: a command is missing" + hint}));
-    EXPECT_EQ(plain({"server"}), (Ended{2, "", "cimdhcp: there is no command \"server\"" + hint}));
+    EXPECT_EQ(
+        plain({"server"}),
+        (Ended{2, "", "cimdhcp: there is no command \"server\"; did you mean serve?" + hint}));
     EXPECT_EQ(plain({"get"}), (Ended{2, "", "cimdhcp: PATH is required" + hint}));
     EXPECT_EQ(
         plain({"--format", "mof", "show"}),
@@ -110,6 +112,16 @@ TEST_F(Usage, ATreeFromStandardInputIsToldOfUnderThatName) {
 TEST_F(Usage, ADataDirectoryThatIsNoneIsStatusThree) {
     EXPECT_EQ(plain({"--data-dir", tree(), "show"}),
               (Ended{3, "", "cimdhcp: " + tree() + ": is not a directory\n"}));
+    const std::string slip = directory() / "slip";
+    for (const std::vector<std::string>& command :
+         {std::vector<std::string>{"show"}, {"rename", "eth0", "office", "--create"}}) {
+        std::vector<std::string> arguments{"--tree", tree(), "--data-dir", slip};
+        arguments.insert(arguments.end(), command.begin(), command.end());
+        EXPECT_EQ(plain(arguments), (Ended{3, "",
+                                           "cimdhcp: --data-dir " + slip +
+                                               ": there is no such directory; mkdir makes it\n"}));
+        EXPECT_FALSE(std::filesystem::exists(slip));
+    }
 }
 
 TEST_F(Usage, UnusableSettingsAreTold) {

@@ -3,8 +3,13 @@
 #include <gtest/gtest.h>
 #include <sys/ioctl.h>
 
+#include <condition_variable>
 #include <cstdlib>
+#include <mutex>
+#include <ostream>
 #include <sstream>
+#include <streambuf>
+#include <string>
 
 #include "text/ProgressBar.h"
 #include "text/Style.h"
@@ -115,6 +120,52 @@ TEST(ProgressBar, GoesAwayBeforeAnythingElseIsWritten) {
 TEST(ProgressBar, IsForTerminals) {
     std::ostringstream out;
     ProgressBar(out, std::nullopt, 2).show(1, 1);
+    EXPECT_EQ(out.str(), "");
+}
+
+/// What is written to a terminal, for those who wait for it.
+class WatchedTerminal : public std::streambuf {
+  public:
+    /// All that has been written, as soon as that is so long.
+    std::string waitFor(std::size_t length) {
+        std::unique_lock lock(mutex_);
+        changed_.wait(lock, [&] { return text_.size() >= length; });
+        return text_;
+    }
+
+  protected:
+    std::streamsize xsputn(const char* text, std::streamsize length) override {
+        const std::lock_guard lock(mutex_);
+        text_.append(text, static_cast<std::size_t>(length));
+        changed_.notify_all();
+        return length;
+    }
+    int_type overflow(int_type letter) override {
+        const char text = traits_type::to_char_type(letter);
+        return xsputn(&text, 1) == 1 ? letter : traits_type::eof();
+    }
+
+  private:
+    std::mutex mutex_;
+    std::condition_variable changed_;
+    std::string text_;
+};
+
+TEST(WaitingLine, SaysHowLongItTakesAndGoesAway) {
+    WatchedTerminal terminal;
+    std::ostream out(&terminal);
+    const std::string line = "\r\x1B[Kreading, 1 s";
+    {
+        const WaitingLine waiting(out, 40, "reading");
+        EXPECT_EQ(terminal.waitFor(line.size()), line);
+    }
+    EXPECT_TRUE(terminal.waitFor(0).ends_with("\r\x1B[K"));
+}
+
+TEST(WaitingLine, IsForWhatTakesLongOnATerminal) {
+    std::ostringstream out;
+    { const WaitingLine waiting(out, 40, "reading"); }
+    { const WaitingLine waiting(out, std::nullopt, "reading"); }
     EXPECT_EQ(out.str(), "");
 }
 

@@ -1,8 +1,14 @@
 #pragma once
 
+#include <optional>
+#include <string>
+#include <vector>
+
 #include "arguments/Commands.h"
+#include "cimom/Forward.h"
 #include "cimom/ObjectPath.h"
 #include "client/Response.h"
+#include "text/Failure.h"
 
 namespace cimdhcp {
 
@@ -18,6 +24,30 @@ struct CimOperation {
     cimom::ObjectPath path;  ///< of the class or instance that was asked for
     Response response;
 };
+
+/// Whether clients may change the property, by its class and by what the provider looks at.
+[[nodiscard]] bool mayBeWritten(const cimom::ClassDeclaration& declaration,
+                                const cimom::PropertyDeclaration& property);
+
+/// The names of the references of served associations, of the class given or of all.
+[[nodiscard]] std::vector<std::string> rolesOf(const std::optional<std::string>& assocClass,
+                                               Client& client);
+
+/// "CLASS has no property \"NAME\"", with the nearest name that it has.
+[[nodiscard]] std::string noPropertyText(const cimom::ClassDeclaration& declaration,
+                                         const std::string& name);
+
+/// What the status of a response that is not OK comes from, as far as the names that were
+/// asked for show it: the failure with the class that was likely meant, or the keys that the
+/// class has.
+[[nodiscard]] Failure explainedFailure(const CimOperation& operation, Client& client);
+
+/// Throws Failure when the response is empty, or refused, for the sake of what is not there:
+/// the instance, a class that filters, or a role that no association has.
+void refuseMissingSource(const AssociatorsCommand& command, const CimOperation& operation,
+                         Client& client);
+void refuseMissingSource(const ReferencesCommand& command, const CimOperation& operation,
+                         Client& client);
 
 // The commands that are one CIM operation each. They throw Failure when their
 // arguments cannot be understood.

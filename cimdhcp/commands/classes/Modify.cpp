@@ -10,7 +10,7 @@
 #include "cimom/ClassDeclaration.h"
 #include "cimom/Names.h"
 #include "client/Client.h"
-#include "commands/CimOperations.h"
+#include "commands/classes/CimOperations.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
 #include "text/ValueMeaning.h"
@@ -33,8 +33,7 @@ std::pair<std::string, std::string> splitAssignment(const std::string& text) {
 Response noSuchProperty(const cimom::ClassDeclaration& declaration, const std::string& name) {
     Response response;
     response.operation = "ModifyInstance";
-    response.status = {CMPI_RC_ERR_NO_SUCH_PROPERTY,
-                       declaration.name + " has no property \"" + name + "\""};
+    response.status = {CMPI_RC_ERR_NO_SUCH_PROPERTY, noPropertyText(declaration, name)};
     return response;
 }
 
@@ -47,14 +46,6 @@ auto find(Values& values, const std::string& name) {
 bool isConfigurationName(const cimom::ClassDeclaration& declaration, std::string_view property) {
     return cimom::sameName(declaration.name, settingClass) &&
            cimom::sameName(property, nameProperty);
-}
-
-bool isWritable(const cimom::ClassDeclaration& declaration,
-                const cimom::PropertyDeclaration& property) {
-    if (cimom::sameName(declaration.name, settingClass)) {
-        return isConfigurationName(declaration, property.name);
-    }
-    return !property.isKey() && cimom::isTrue(property.qualifier("Write"));
 }
 
 void refuseBlanksAtEnds(const std::string& name, const std::string& value) {
@@ -95,7 +86,7 @@ Assignments readAssignments(const ModifyCommand& command, const std::string& cla
         if (isConfigurationName(*declaration, name)) {
             refuseBlanksAtEnds(property->name, value);
         }
-        if (!isWritable(*declaration, *property)) {
+        if (!mayBeWritten(*declaration, *property)) {
             unwritable += (unwritable.empty() ? "" : ", ") + property->name;
         }
     }
@@ -193,6 +184,14 @@ void compare(const std::vector<cimom::NamedValue>& wanted, const cimom::Instance
 }
 
 }  // namespace
+
+bool mayBeWritten(const cimom::ClassDeclaration& declaration,
+                  const cimom::PropertyDeclaration& property) {
+    if (cimom::sameName(declaration.name, settingClass)) {
+        return isConfigurationName(declaration, property.name);
+    }
+    return !property.isKey() && cimom::isTrue(property.qualifier("Write"));
+}
 
 CimOperation carryOut(const ModifyCommand& command, Client& client) {
     const cimom::ObjectPath path =

@@ -1,4 +1,4 @@
-#include "commands/RenameFiles.h"
+#include "commands/rename/RenameFiles.h"
 
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -12,7 +12,7 @@
 #include <utility>
 #include <vector>
 
-#include "commands/RenameRefusals.h"
+#include "commands/rename/RenameRefusals.h"
 #include "text/Failure.h"
 #include "zrcommon/File.h"
 #include "zrcommon/InterfaceFile.h"

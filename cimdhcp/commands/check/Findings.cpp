@@ -1,4 +1,4 @@
-#include "commands/Findings.h"
+#include "commands/check/Findings.h"
 
 #include <algorithm>
 #include <utility>

@@ -1,4 +1,4 @@
-#include "commands/Rename.h"
+#include "commands/rename/Rename.h"
 
 #include <algorithm>
 #include <cstddef>
@@ -9,9 +9,10 @@
 #include "client/Client.h"
 #include "client/MachineInterfaces.h"
 #include "client/Response.h"
-#include "commands/CimOperations.h"
-#include "commands/RenameFiles.h"
-#include "commands/RenameRefusals.h"
+#include "commands/Detail.h"
+#include "commands/classes/CimOperations.h"
+#include "commands/rename/RenameFiles.h"
+#include "commands/rename/RenameRefusals.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
 #include "text/JsonText.h"
@@ -61,11 +62,11 @@ Setting find(const std::string& wanted, const std::vector<Setting>& all) {
         }
     }
     if (found.empty()) {
-        throw Failure(
-            ExitStatus::notDone,
-            "there is no interface \"" + printable(wanted) + "\"; " +
-                (all.empty() ? "this machine has none"
-                             : "this machine has: " + list(all, &Setting::interfaceName)));
+        std::vector<std::string> known;
+        for (const Setting& setting : all) {
+            known.push_back(setting.interfaceName);
+        }
+        refuseInterface(wanted, known);
     }
     if (found.size() > 1) {
         throw Failure(ExitStatus::notDone, "there are several interfaces \"" + printable(wanted) +

@@ -1,4 +1,4 @@
-#include "commands/Check.h"
+#include "commands/check/Check.h"
 
 #include <unistd.h>
 
@@ -14,8 +14,8 @@
 #include "client/EmbeddedClient.h"
 #include "client/Response.h"
 #include "commands/DiagnosticText.h"
-#include "commands/Findings.h"
 #include "commands/PlatformSetup.h"
+#include "commands/check/Findings.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
 #include "zrclient/InstrumentationService.h"

@@ -1,4 +1,4 @@
-#include "commands/RenameRefusals.h"
+#include "commands/rename/RenameRefusals.h"
 
 #include <algorithm>
 #include <array>

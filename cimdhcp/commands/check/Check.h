@@ -5,7 +5,7 @@
 
 #include "arguments/Commands.h"
 #include "client/Installation.h"
-#include "commands/Findings.h"
+#include "commands/check/Findings.h"
 
 namespace cimdhcp {
 
