@@ -192,12 +192,11 @@ struct CompleteCommand {
     bool operator==(const CompleteCommand&) const = default;
 };
 
-using Command =
-    std::variant<ShowCommand, WatchCommand, RenameCommand, GraphCommand, TreeCommand,
-                 ClassesCommand, NamesCommand, InstancesCommand, GetCommand, ModifyCommand,
-                 AssociatorsCommand, ReferencesCommand, ServeCommand, UserAddCommand, CheckCommand,
-                 ProfilesCommand, MetricsCommand, ExporterCommand, DescribeCommand,
-                 CompleteCommand>;
+using Command = std::variant<ShowCommand, WatchCommand, RenameCommand, GraphCommand, TreeCommand,
+                             ClassesCommand, NamesCommand, InstancesCommand, GetCommand,
+                             ModifyCommand, AssociatorsCommand, ReferencesCommand, ServeCommand,
+                             UserAddCommand, CheckCommand, ProfilesCommand, MetricsCommand,
+                             ExporterCommand, DescribeCommand, CompleteCommand>;
 
 struct CommandLine {
     Options options;

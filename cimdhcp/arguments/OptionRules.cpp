@@ -126,8 +126,7 @@ void checkLimits(const Command& command) {
 
 bool asksClient(const Command& command) noexcept {
     return !isOneOf<TreeCommand, ServeCommand, UserAddCommand, CheckCommand, ExporterCommand,
-                    CompleteCommand>(
-        command);
+                    CompleteCommand>(command);
 }
 
 void completeCommandLine(CommandLine& line) {

@@ -189,7 +189,7 @@ Arguments written(const CommandLine& line) {
     addOption(writer.arguments, "cacert", line.options.caCertificate);
     addFlag(writer.arguments, "insecure", line.options.insecure);
     addOption(writer.arguments, "credentials", line.options.credentials);
-    addFlag(writer.arguments, "no-header", line.options.noHeader);
+    addFlag(writer.arguments, "no-header", line.options.table.noHeader);
     addOption(writer.arguments, "sort", line.options.sort);
     addFlag(writer.arguments, "count", line.options.count);
     addFlag(writer.arguments, "time", line.options.time);

@@ -193,8 +193,8 @@ std::string_view variable(std::string_view name, std::string_view file, unsigned
 
 std::string_view variable(std::string_view name, std::string_view file, unsigned line,
                           unsigned value) {
-    return formatAll<numberVariable>(buffersOfThread().numberVariable, Argument(name), Argument(value),
-                                     Argument(line), Argument(file));
+    return formatAll<numberVariable>(buffersOfThread().numberVariable, Argument(name),
+                                     Argument(value), Argument(line), Argument(file));
 }
 
 std::string_view plain(std::string_view file, std::string_view function, unsigned line,
