@@ -3,7 +3,7 @@
 
 #include "Input.h"
 #include "configuration/KernelBoot.h"
-#include "support/Addresses.h"
+#include "support/Texts.h"
 
 namespace {
 

@@ -7,7 +7,7 @@
 
 #include "Input.h"
 #include "facts/Lease.h"
-#include "support/Addresses.h"
+#include "support/Texts.h"
 
 namespace {
 

@@ -2,9 +2,8 @@
 #include "configuration/Ifcfg.h"
 
 #include "Input.h"
-#include "formats/ShellAssignments.h"
-#include "support/Addresses.h"
-#include "support/ShellText.h"
+#include "formats/Assignments.h"
+#include "support/Texts.h"
 
 int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
     const std::string_view text = fuzz::text(data, size);

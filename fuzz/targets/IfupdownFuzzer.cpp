@@ -2,7 +2,7 @@
 #include "configuration/Ifupdown.h"
 
 #include "Input.h"
-#include "support/Addresses.h"
+#include "support/Texts.h"
 
 namespace {
 

@@ -2,8 +2,7 @@
 #include "clients/Ipconfig.h"
 
 #include "Input.h"
-#include "support/Addresses.h"
-#include "support/ShellText.h"
+#include "support/Texts.h"
 
 int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
     using Protocol = ZR::Live::IpconfigResult::Protocol;

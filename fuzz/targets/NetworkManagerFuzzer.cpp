@@ -3,7 +3,7 @@
 #include "clients/NetworkManager.h"
 
 #include "Input.h"
-#include "support/Addresses.h"
+#include "support/Texts.h"
 
 namespace {
 

@@ -3,7 +3,7 @@
 
 #include "Input.h"
 #include "clients/NetworkdBus.h"
-#include "support/Addresses.h"
+#include "support/Texts.h"
 
 namespace {
 

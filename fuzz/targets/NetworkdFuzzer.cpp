@@ -7,7 +7,7 @@
 #include "formats/NetworkFile.h"
 #include "formats/NetworkdLease.h"
 #include "formats/ValueFormats.h"
-#include "support/Addresses.h"
+#include "support/Texts.h"
 
 namespace {
 

@@ -5,7 +5,7 @@
 
 #include "Input.h"
 #include "clients/Processes.h"
-#include "support/Addresses.h"
+#include "support/Texts.h"
 
 namespace {
 

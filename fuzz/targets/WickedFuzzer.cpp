@@ -6,7 +6,7 @@
 #include <algorithm>
 
 #include "Input.h"
-#include "support/Addresses.h"
+#include "support/Texts.h"
 
 namespace {
 

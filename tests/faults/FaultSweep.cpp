@@ -12,7 +12,6 @@
 
 #include "kit/Allocations.h"
 #include "kit/FileContent.h"
-#include "kit/OpenDescriptors.h"
 #include "kit/SystemCalls.h"
 
 namespace test {

@@ -2,7 +2,9 @@
 
 #include <array>
 #include <cstddef>
+#include <filesystem>
 #include <fstream>
+#include <iterator>
 #include <stdexcept>
 #include <string>
 #include <string_view>
@@ -31,6 +33,12 @@ inline void writeFile(const std::string& path, std::string_view content) {
     if (!file) {
         throw std::runtime_error("cannot write " + path);
     }
+}
+
+/// How many descriptors this process has open, with the one that it takes to count them.
+inline std::ptrdiff_t openDescriptors() {
+    const std::filesystem::directory_iterator all("/proc/self/fd");
+    return std::distance(begin(all), end(all));
 }
 
 }  // namespace ZR::Testing

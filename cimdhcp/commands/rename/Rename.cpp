@@ -12,7 +12,6 @@
 #include "commands/Detail.h"
 #include "commands/classes/CimOperations.h"
 #include "commands/rename/RenameFiles.h"
-#include "commands/rename/RenameRefusals.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
 #include "text/JsonText.h"

@@ -12,7 +12,6 @@
 #include <utility>
 #include <vector>
 
-#include "commands/rename/RenameRefusals.h"
 #include "text/Failure.h"
 #include "zrcommon/File.h"
 #include "zrcommon/InterfaceFile.h"

@@ -1,4 +1,4 @@
-#include "commands/rename/RenameRefusals.h"
+#include "commands/rename/RenameFiles.h"
 
 #include <algorithm>
 #include <array>

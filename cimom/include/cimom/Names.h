@@ -1,5 +1,6 @@
 #pragma once
 
+#include <algorithm>
 #include <cstddef>
 #include <cstdint>
 #include <string_view>
@@ -22,7 +23,10 @@ namespace cimom {
 }
 
 /// Names compare without regard to case (ASCII).
-[[nodiscard]] bool sameName(std::string_view a, std::string_view b) noexcept;
+[[nodiscard]] constexpr bool sameName(std::string_view a, std::string_view b) noexcept {
+    return std::equal(a.begin(), a.end(), b.begin(), b.end(),
+                      [](char x, char y) { return lowered(x) == lowered(y); });
+}
 
 /// FNV-1a over the lower-cased name. With NameEqual it lets hashed containers
 /// find names without regard to case and without a copy.

@@ -6,8 +6,8 @@
 #include <utility>
 
 #include "facts/ClientFacts.h"
+#include "formats/Assignments.h"
 #include "formats/Files.h"
-#include "formats/KeyFile.h"
 #include "formats/Trust.h"
 
 namespace ZR::Live {

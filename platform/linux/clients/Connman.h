@@ -5,7 +5,7 @@
 #include <string_view>
 
 #include "facts/ClientFacts.h"
-#include "facts/NamePatterns.h"
+#include "formats/InterfaceName.h"
 #include "formats/Files.h"
 #include "formats/IpAddress.h"
 

@@ -6,8 +6,8 @@
 #include <string>
 #include <vector>
 
+#include "formats/Assignments.h"
 #include "formats/Files.h"
-#include "formats/ShellAssignments.h"
 #include "formats/Trust.h"
 #include "formats/ValueFormats.h"
 

@@ -7,8 +7,8 @@
 #include <utility>
 
 #include "facts/ClientFacts.h"
+#include "formats/Assignments.h"
 #include "formats/Files.h"
-#include "formats/KeyFile.h"
 #include "formats/NetworkdLease.h"
 #include "formats/Trust.h"
 #include "formats/ValueFormats.h"

@@ -9,9 +9,9 @@
 #include <string>
 #include <vector>
 
+#include "formats/Assignments.h"
 #include "formats/Files.h"
 #include "formats/OptionWalk.h"
-#include "formats/ShellAssignments.h"
 #include "formats/Trust.h"
 #include "formats/ValueFormats.h"
 

@@ -4,9 +4,9 @@
 #include <cstddef>
 #include <utility>
 
+#include "formats/Assignments.h"
 #include "formats/Files.h"
 #include "formats/InterfaceName.h"
-#include "formats/ShellAssignments.h"
 
 namespace ZR::Live {
 namespace {

@@ -5,15 +5,25 @@
 #include <string>
 #include <vector>
 
-#include "facts/BootResponse.h"
 #include "facts/Lease.h"
 #include "facts/LinkConfiguration.h"
 #include "facts/RunningPrograms.h"
+#include "formats/IpAddress.h"
 #include "kernel/Sockets.h"
 #include "kernel/WatchedPlace.h"
 #include "zrclient/Diagnostic.h"
 
 namespace ZR::Live {
+
+/// What the kernel was given when it asked for an address at its start (ip=). It does not
+/// tell which address that was, nor on which link.
+struct BootResponse {
+    bool bootp = false;               ///< came by BOOTP, else by DHCP
+    std::optional<IpAddress> server;  ///< of the boot files
+    std::string origin{};             ///< the file that says so
+
+    bool operator==(const BootResponse&) const = default;
+};
 
 /// Everything that the clients' processes and files, and the files of their
 /// configuration, say.

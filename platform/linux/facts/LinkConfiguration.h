@@ -6,7 +6,6 @@
 #include <vector>
 
 #include "facts/Client.h"
-#include "facts/NamePatterns.h"
 #include "formats/InterfaceName.h"
 #include "formats/IpAddress.h"
 

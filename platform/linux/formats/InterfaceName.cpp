@@ -1,5 +1,7 @@
 #include "formats/InterfaceName.h"
 
+#include <fnmatch.h>
+
 #include <algorithm>
 
 namespace ZR::Live {
@@ -16,6 +18,15 @@ std::optional<InterfaceName> InterfaceName::from(std::string_view text) noexcept
             return byte == '/' || byte == '\0' || byte == ' ' || (byte >= '\t' && byte <= '\r');
         });
     return isName ? std::optional{InterfaceName{text}} : std::nullopt;
+}
+
+bool NamePatterns::take(const InterfaceName& name) const {
+    const std::string text{name.view()};
+    const auto matches = [&text](const std::string& pattern) {
+        return ::fnmatch(pattern.c_str(), text.c_str(), 0) == 0;
+    };
+    return (taken.empty() || std::any_of(taken.begin(), taken.end(), matches)) &&
+           std::none_of(left.begin(), left.end(), matches);
 }
 
 }  // namespace ZR::Live

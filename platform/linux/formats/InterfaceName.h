@@ -5,7 +5,9 @@
 #include <cstddef>
 #include <cstdint>
 #include <optional>
+#include <string>
 #include <string_view>
+#include <vector>
 
 namespace ZR::Live {
 
@@ -33,6 +35,18 @@ class InterfaceName {
 
     std::array<char, maxLength> bytes_{};
     std::uint8_t length_;
+};
+
+/// Links that a program was told to take, and to leave alone, by patterns of their names, in
+/// which "*" and "?" stand for any text and any character.
+struct NamePatterns {
+    std::vector<std::string> taken;  ///< empty: all
+    std::vector<std::string> left;   ///< these not, whatever is taken
+
+    /// Whether the program was told to take a link of this name.
+    [[nodiscard]] bool take(const InterfaceName& name) const;
+
+    bool operator==(const NamePatterns&) const = default;
 };
 
 }  // namespace ZR::Live

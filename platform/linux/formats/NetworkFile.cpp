@@ -4,7 +4,7 @@
 #include <array>
 #include <optional>
 
-#include "formats/KeyFile.h"
+#include "formats/Assignments.h"
 
 namespace ZR::Live {
 namespace {

@@ -9,7 +9,6 @@
 #include <filesystem>
 
 #include "commands/rename/RenameFiles.h"
-#include "commands/rename/RenameRefusals.h"
 #include "kit/ChildProcess.h"
 #include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"

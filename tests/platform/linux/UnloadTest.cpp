@@ -3,7 +3,7 @@
 
 #include <cstdlib>
 
-#include "kit/OpenDescriptors.h"
+#include "kit/FileContent.h"
 #include "kit/ZrclientSupport.h"
 
 namespace ZR::Testing {

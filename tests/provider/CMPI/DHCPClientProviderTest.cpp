@@ -5,9 +5,9 @@
 
 #include "DHCPClientProvider.h"
 #include "cimom/Instance.h"
+#include "kit/FileContent.h"
 #include "kit/Host.h"
 #include "kit/LogCapture.h"
-#include "kit/OpenDescriptors.h"
 #include "kit/Tree.h"
 
 namespace {

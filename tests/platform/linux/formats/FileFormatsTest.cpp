@@ -7,11 +7,10 @@
 #include <vector>
 
 #include "LinuxSupport.h"
-#include "formats/KeyFile.h"
+#include "formats/Assignments.h"
 #include "formats/NetworkFile.h"
 #include "formats/NetworkdLease.h"
 #include "formats/OptionWalk.h"
-#include "formats/ShellAssignments.h"
 #include "formats/ValueFormats.h"
 
 namespace ZR::Live {

@@ -1,4 +1,4 @@
-#include "formats/ShellAssignments.h"
+#include "formats/Assignments.h"
 
 #include <algorithm>
 #include <cstddef>
