@@ -25,6 +25,13 @@ void addFlag(Arguments& arguments, const char* name, bool given) {
     }
 }
 
+/// Each name of a list, which may be given one by one.
+void addList(Arguments& arguments, const char* name, const Arguments& values) {
+    for (const std::string& value : values) {
+        addOption(arguments, name, value);
+    }
+}
+
 /// Operands, which may begin with a "-".
 void addOperands(Arguments& arguments, const Arguments& operands) {
     arguments.emplace_back("--");
@@ -35,7 +42,10 @@ void addOperands(Arguments& arguments, const Arguments& operands) {
 struct Writer {
     Arguments arguments;
 
-    void operator()(const cimdhcp::ShowCommand&) { arguments.emplace_back("show"); }
+    void operator()(const cimdhcp::ShowCommand& command) {
+        arguments.emplace_back("show");
+        addOperands(arguments, command.interfaces);
+    }
     void operator()(const cimdhcp::WatchCommand& command) {
         arguments.emplace_back("watch");
         if (command.poll) {
@@ -50,6 +60,7 @@ struct Writer {
     void operator()(const cimdhcp::RenameCommand& command) {
         arguments.emplace_back("rename");
         addFlag(arguments, "create", command.create);
+        addFlag(arguments, "force", command.force);
         addOperands(arguments, {command.interfaceName, command.name});
     }
     void operator()(const cimdhcp::GraphCommand& command) {
@@ -60,16 +71,27 @@ struct Writer {
         arguments.emplace_back("tree");
         addFlag(arguments, "explain", command.explain);
     }
+    void operator()(const cimdhcp::DescribeCommand& command) {
+        arguments.emplace_back("describe");
+        addOperands(arguments, {command.className});
+    }
+    void operator()(const cimdhcp::CompleteCommand& command) {
+        // What stands before it would be of the line that is completed.
+        arguments = {"complete"};
+        arguments.insert(arguments.end(), command.words.begin(), command.words.end());
+    }
     void operator()(const cimdhcp::NamesCommand& command) {
         arguments.emplace_back("names");
         addOperands(arguments, {command.className});
     }
     void operator()(const cimdhcp::InstancesCommand& command) {
         arguments.emplace_back("instances");
+        addList(arguments, "properties", command.properties);
         addOperands(arguments, {command.className});
     }
     void operator()(const cimdhcp::GetCommand& command) {
         arguments.emplace_back("get");
+        addList(arguments, "properties", command.properties);
         addOperands(arguments, {command.path});
     }
     void operator()(const cimdhcp::ModifyCommand& command) {
@@ -101,6 +123,7 @@ struct Writer {
         addOption(arguments, "tls-key", command.tlsKey);
         addOption(arguments, "users", command.users);
         addFlag(arguments, "read-only", command.readOnly);
+        addOption(arguments, "metrics", command.metrics);
         addOption(arguments, "subscriptions", command.subscriptions);
         addOption(arguments, "listener-cacert", command.delivery.caCertificates);
         addLimits(command.limits);
@@ -112,6 +135,19 @@ struct Writer {
         addSeconds("retry-interval", command.delivery.retryInterval);
         addSeconds("listener-timeout", command.delivery.patience);
         addSeconds("give-up-after", command.delivery.removalTime);
+    }
+    void operator()(const cimdhcp::MetricsCommand& command) {
+        arguments.emplace_back("metrics");
+        addOption(arguments, "output", command.output);
+    }
+    void operator()(const cimdhcp::ExporterCommand& command) {
+        arguments.emplace_back("exporter");
+        addOption(arguments, "config", command.config);
+        addOption(arguments, "listen", command.server.listen);
+        addOption(arguments, "tls-cert", command.server.tlsCertificate);
+        addOption(arguments, "tls-key", command.server.tlsKey);
+        addOption(arguments, "users", command.server.users);
+        addFlag(arguments, "check", command.check);
     }
     void operator()(const cimdhcp::UserAddCommand& command) {
         arguments.emplace_back("user");
@@ -159,6 +195,7 @@ struct Writer {
 const char* nameOf(cimdhcp::Format format) {
     return format == cimdhcp::Format::mof    ? "mof"
            : format == cimdhcp::Format::json ? "json"
+           : format == cimdhcp::Format::tsv  ? "tsv"
                                              : "table";
 }
 
@@ -189,7 +226,12 @@ Arguments written(const CommandLine& line) {
     addOption(writer.arguments, "cacert", line.options.caCertificate);
     addFlag(writer.arguments, "insecure", line.options.insecure);
     addOption(writer.arguments, "credentials", line.options.credentials);
+    addOption(writer.arguments, "failed", line.options.failed);
+    addFlag(writer.arguments, "exact", line.options.exact);
+    addFlag(writer.arguments, "debug", line.options.debug);
     addFlag(writer.arguments, "no-header", line.options.table.noHeader);
+    addFlag(writer.arguments, "wide", line.options.table.wide);
+    addList(writer.arguments, "columns", line.options.table.columns);
     addOption(writer.arguments, "sort", line.options.sort);
     addFlag(writer.arguments, "count", line.options.count);
     addFlag(writer.arguments, "time", line.options.time);
