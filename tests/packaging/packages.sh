@@ -44,7 +44,7 @@ grep -E '^ExecStart=/usr/bin/cimdhcp (metrics|exporter) ' \
 test -e /usr/lib/systemd/system/cimdhcp-metrics.timer
 [[ -z $(find /etc/systemd/system -name 'cimdhcp*') ]]
 test -s /usr/share/cimdhcp/monitoring/dashboard.json
-grep -Fx 'ExecReload=/bin/kill -HUP $MAINPID' /usr/lib/systemd/system/cimdhcp.service
+grep -Fx 'ExecReload=/bin/kill -HUP $MAINPID' /usr/lib/systemd/system/cimdhcp.service >/dev/null
 for page in man1/cimdhcp.1 man5/zr-platform.conf.5 man8/provider-register.sh.8; do
     test -s /usr/share/man/$page.gz
 done

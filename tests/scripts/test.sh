@@ -42,6 +42,12 @@ runs() { # runs STATUS: what the script prints, without times and with the statu
     cp build/dev/passing build/dev/CTestTestfile.cmake
     echo "== all pass"
     runs 0
+    echo "== one fails once"
+    cp build/dev/CTestTestfile.cmake all
+    echo 'add_test(FailsOnce bash -c "test -e again || { touch again; echo busy; exit 1; }")' \
+        >>build/dev/CTestTestfile.cmake
+    runs 0
+    mv all build/dev/CTestTestfile.cmake
     echo 'add_test(Fails bash -c "echo its output; exit 1")' >>build/dev/CTestTestfile.cmake
     echo 'add_test(IsMissing /no/such/program)' >>build/dev/CTestTestfile.cmake
     echo "== some fail"
@@ -60,6 +66,20 @@ dev: test ... done (N s)
 2 skipped: needs root
 1 skipped: needs a kernel module
 100% tests passed, 0 tests failed out of 4
+== one fails once
+Log: build/dev.log
+dev: configure ... done (N s)
+dev: build ... done (N s)
+dev: test ... FAILED (N s)
+
+== FAILED: FailsOnce
+busy
+2 skipped: needs root
+1 skipped: needs a kernel module
+Failed beside others: FailsOnce
+dev: those alone ... done (N s)
+80% tests passed, 1 tests failed out of 5
+100% tests passed, 0 tests failed out of 1
 == some fail
 Log: build/dev.log
 dev: configure ... done (N s)
@@ -73,11 +93,20 @@ its output
 Unable to find executable: /no/such/program
 2 skipped: needs root
 1 skipped: needs a kernel module
+Failed beside others: Fails IsMissing
+dev: those alone ... FAILED (N s)
+
+== FAILED: Fails
+its output
+
+== FAILED: IsMissing
+Unable to find executable: /no/such/program
 The following tests FAILED:
 	  5 - Fails (Failed)
 	  6 - IsMissing (Not Run)
 Errors while running CTest
 67% tests passed, 2 tests failed out of 6
+0% tests passed, 2 tests failed out of 2
 == does not build
 Log: build/dev.log
 dev: configure ... FAILED (N s)
