@@ -165,6 +165,9 @@ class Served {
                     "localhost"}) {
         cimom::wbem::ServerSettings settings;
         settings.port = 0;
+        // All clients here have one address.
+        settings.limits.connectionsEach = settings.limits.connections;
+        settings.limits.connectionRate = settings.limits.connections;
         server_ = std::make_unique<cimom::wbem::Server>(
             manager_, settings, [](cimom::wbem::LogKind, const std::string&) {});
     }

@@ -5,8 +5,8 @@
 #include <string_view>
 
 #include "facts/ClientFacts.h"
-#include "formats/InterfaceName.h"
 #include "formats/Files.h"
+#include "formats/InterfaceName.h"
 #include "formats/IpAddress.h"
 
 namespace ZR::Live {

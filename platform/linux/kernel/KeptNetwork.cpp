@@ -18,12 +18,13 @@ constexpr auto indexOf = [](const auto& fact) { return fact.ifindex; };
 
 template <typename Fact>
 void replaceLink(std::vector<Fact>& facts, std::uint32_t ifindex, std::vector<Fact>& now) {
-    const auto old = std::ranges::equal_range(facts, ifindex, {}, indexOf);
+    const auto first = std::ranges::lower_bound(facts, ifindex, {}, indexOf);
+    const auto last = std::ranges::upper_bound(first, facts.end(), ifindex, {}, indexOf);
     // Most often it is as many as before, and nothing behind them needs to move.
-    const auto common = std::min(std::ssize(old), std::ssize(now));
-    const auto place = std::move(now.begin(), now.begin() + common, old.begin());
-    if (place != old.end()) {
-        facts.erase(place, old.end());
+    const auto common = std::min(last - first, std::ssize(now));
+    const auto place = std::move(now.begin(), now.begin() + common, first);
+    if (place != last) {
+        facts.erase(place, last);
     } else {
         facts.insert(place, std::move_iterator(now.begin() + common),
                      std::move_iterator(now.end()));
