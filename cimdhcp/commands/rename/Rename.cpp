@@ -62,6 +62,7 @@ Setting find(const std::string& wanted, const std::vector<Setting>& all) {
     }
     if (found.empty()) {
         std::vector<std::string> known;
+        known.reserve(all.size());
         for (const Setting& setting : all) {
             known.push_back(setting.interfaceName);
         }

@@ -51,9 +51,9 @@ class KernelTransport final : public NetlinkTransport {
         }
         // Has the kernel heed which link is asked for. One that does not know the option
         // (before Linux 4.20) sends more, which is left out later.
-        const int strictly = 1;
-        static_cast<void>(::mnl_socket_setsockopt(socket_.get(), NETLINK_GET_STRICT_CHK,
-                                                  const_cast<int*>(&strictly), sizeof strictly));
+        int strictly = 1;
+        static_cast<void>(::mnl_socket_setsockopt(socket_.get(), NETLINK_GET_STRICT_CHK, &strictly,
+                                                  sizeof strictly));
         return 0;
     }
 
