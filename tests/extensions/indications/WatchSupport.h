@@ -91,10 +91,10 @@ class Told {
         };
     }
 
-    /// Whether so many came within ten seconds.
+    /// Whether so many came within a minute.
     bool await(std::size_t count) {
         std::unique_lock lock(mutex_);
-        return changed_.wait_for(lock, 10s, [&] { return all_.size() >= count; });
+        return changed_.wait_for(lock, 60s, [&] { return all_.size() >= count; });
     }
     std::vector<cimom::Instance> all() {
         const std::lock_guard lock(mutex_);
