@@ -149,6 +149,13 @@ void Dispatcher::endOverdue() {
     }
 }
 
+Dispatcher::~Dispatcher() {
+    // None of them goes before the tasks of all have ended.
+    timers_.end();
+    gate_.end();
+    workers_.end();
+}
+
 void Dispatcher::stop() {
     timers_.stop();
     gate_.stop();

@@ -26,6 +26,9 @@ class Dispatcher {
     /// Borrows all of them. Null for `manager`: requests are for pages.
     Dispatcher(ObjectManager* manager, const PageHandler& pages, const ServerSettings& settings,
                const ServerLog& log, AddressShares& shares, ServerCounts& counts);
+    ~Dispatcher();
+    Dispatcher(const Dispatcher&) = delete;
+    Dispatcher& operator=(const Dispatcher&) = delete;
 
     /// Whether the head of a request, with users, proves without a long check who sent it.
     [[nodiscard]] bool isRemembered(Exchange& exchange);
@@ -66,7 +69,7 @@ class Dispatcher {
     std::optional<Operations> operations_;
     std::optional<Authenticator> authenticator_;
     FairQueue checks_;
-    // End first, in this order reversed: their tasks use all of the above.
+    // Their tasks use all of the above, and each other's pools: see the destructor.
     TaskPool workers_;
     TaskPool gate_;
     TaskPool timers_;

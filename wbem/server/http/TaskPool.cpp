@@ -15,9 +15,15 @@ TaskPool::TaskPool(std::size_t threads, std::size_t waiting, std::size_t spares)
 }
 
 TaskPool::~TaskPool() {
+    end();
+}
+
+void TaskPool::end() {
     stop();
     for (Worker& worker : workers_) {
-        worker.thread.join();
+        if (worker.thread.joinable()) {
+            worker.thread.join();
+        }
     }
 }
 

@@ -25,7 +25,7 @@ class TaskPool {
 
     /// `waiting` tasks may wait for a thread; `spares` threads may be replaced at a time.
     TaskPool(std::size_t threads, std::size_t waiting, std::size_t spares = 0);
-    /// Waits for the tasks that run, and forgets those that wait.
+    /// As end().
     ~TaskPool();
     TaskPool(const TaskPool&) = delete;
     TaskPool& operator=(const TaskPool&) = delete;
@@ -42,6 +42,8 @@ class TaskPool {
 
     /// Takes no more tasks, and forgets those that wait; does not wait itself.
     void stop();
+    /// The same, and waits for the tasks that run. Not in a task of the pool.
+    void end();
 
   private:
     struct Worker {
