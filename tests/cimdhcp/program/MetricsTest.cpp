@@ -64,16 +64,6 @@ class MetricsProgram : public test::ProgramTest {
         return ended.status == 0 ? ended.out : ended.err;
     }
 
-    std::string certificate() const {
-        const Ended made = runAs(
-            "/usr/bin/openssl",
-            {"req", "-x509", "-newkey", "ec", "-pkeyopt", "ec_paramgen_curve:prime256v1", "-nodes",
-             "-days", "2", "-subj", "/CN=localhost", "-addext", "subjectAltName=IP:127.0.0.1",
-             "-keyout", directory() / "key.pem", "-out", directory() / "cert.pem"});
-        EXPECT_EQ(made.status, 0) << made.err;
-        return directory() / "cert.pem";
-    }
-
     std::string configure(const std::string& json) const {
         ZR::Testing::writeFile(directory() / "exporter.json", json);
         return directory() / "exporter.json";

@@ -139,6 +139,16 @@ Ended ProgramTest::run(std::vector<std::string> arguments, const Environment& ex
     return runAs(program(), onTree(std::move(arguments)), extra);
 }
 
+std::string ProgramTest::certificate(const std::string& names) const {
+    const Ended made =
+        runAs("/usr/bin/openssl",
+              {"req", "-x509", "-newkey", "ec", "-pkeyopt", "ec_paramgen_curve:prime256v1",
+               "-nodes", "-days", "2", "-subj", "/CN=test", "-addext", "subjectAltName=" + names,
+               "-keyout", directory() / "key.pem", "-out", directory() / "cert.pem"});
+    EXPECT_EQ(made.status, 0) << made.err;
+    return directory() / "cert.pem";
+}
+
 Ended ProgramTest::runAs(const std::string& program, const std::vector<std::string>& arguments,
                          const Environment& extra) const {
     Environment environment{{"ZR_CONFIG", directory_ / "platform.conf"}, {"ZR_LOG_SINK", "none"}};

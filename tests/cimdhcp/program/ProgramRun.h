@@ -41,6 +41,9 @@ class ProgramTest : public ::testing::Test {
     Ended runOnTerminal(unsigned short columns, std::vector<std::string> arguments,
                         const Environment& extra = {}) const;
 
+    /// Makes cert.pem and key.pem in the directory, for these names; where the first is.
+    std::string certificate(const std::string& names = "IP:127.0.0.1") const;
+
     /// Makes a users file with ada, who may modify, and bob; "pass-" and the name is the password.
     std::string usersFile() const;
 

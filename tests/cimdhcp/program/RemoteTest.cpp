@@ -70,16 +70,6 @@ class Remote : public test::ProgramTest {
         return file;
     }
 
-    std::string certificate(const std::string& names) const {
-        const Ended made = runAs(
-            "/usr/bin/openssl",
-            {"req", "-x509", "-newkey", "ec", "-pkeyopt", "ec_paramgen_curve:prime256v1", "-nodes",
-             "-days", "2", "-subj", "/CN=test", "-addext", "subjectAltName=" + names, "-keyout",
-             directory() / "key.pem", "-out", directory() / "cert.pem"});
-        EXPECT_EQ(made.status, 0) << made.err;
-        return directory() / "cert.pem";
-    }
-
     std::unique_ptr<test::ServedProgram> server_;
     const std::string setting = "QVXZR_DHCPSettingData.InstanceID=\"Computer%eth0\"";
 };

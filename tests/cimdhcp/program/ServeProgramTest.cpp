@@ -86,16 +86,6 @@ class Serve : public test::ProgramTest {
         return awaitLog("stay until a restart", before);
     }
 
-    std::string certificate() const {
-        const Ended made = runAs(
-            "/usr/bin/openssl",
-            {"req", "-x509", "-newkey", "ec", "-pkeyopt", "ec_paramgen_curve:prime256v1", "-nodes",
-             "-days", "2", "-subj", "/CN=localhost", "-addext", "subjectAltName=IP:127.0.0.1",
-             "-keyout", directory() / "key.pem", "-out", directory() / "cert.pem"});
-        EXPECT_EQ(made.status, 0) << made.err;
-        return directory() / "cert.pem";
-    }
-
     std::unique_ptr<test::ServedProgram> server_;
     const std::string setting = "QVXZR_DHCPSettingData.InstanceID=\"Computer%eth0\"";
 };
