@@ -33,15 +33,17 @@ set_tests_properties(Skips SkipsToo PROPERTIES SKIP_RETURN_CODE 77)
 add_test(SkipsItself printf "/a.cpp:1: Skipped\\nneeds a kernel module\\n\\n[  SKIPPED ] A.B\\n")
 set_tests_properties(SkipsItself PROPERTIES SKIP_REGULAR_EXPRESSION "SKIPPED")
 TEXT
-runs() { # runs STATUS: what the script prints, without times and with the status wanted
+runs() { # runs STATUS [OPTION]: what the script prints, without times and with the status wanted
     local status=0
-    PATH=$directory/bin:$PATH scripts/test dev 2>&1 | sed -E 's/\([0-9]+ s\)/(N s)/' || status=$?
+    PATH=$directory/bin:$PATH scripts/test "${@:2}" dev 2>&1 | sed -E 's/\([0-9]+ s\)/(N s)/' || status=$?
     ((status == $1)) || echo "status $status, not $1"
 }
 {
     cp build/dev/passing build/dev/CTestTestfile.cmake
     echo "== all pass"
     runs 0
+    echo "== builds only"
+    runs 0 --build
     echo "== one fails once"
     cp build/dev/CTestTestfile.cmake all
     echo 'add_test(FailsOnce bash -c "test -e again || { touch again; echo busy; exit 1; }")' \
@@ -66,6 +68,10 @@ dev: test ... done (N s)
 2 skipped: needs root
 1 skipped: needs a kernel module
 100% tests passed, 0 tests failed out of 4
+== builds only
+Log: build/dev.log
+dev: configure ... done (N s)
+dev: build ... done (N s)
 == one fails once
 Log: build/dev.log
 dev: configure ... done (N s)
