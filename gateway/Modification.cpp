@@ -6,7 +6,6 @@
 
 #include "Completion.h"
 #include "Lookup.h"
-#include "UnchangedReason.h"
 #include "Values.h"
 #include "providerutilities/ProviderUtilities.h"
 #include "providerutilities/Refusal.h"

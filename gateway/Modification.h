@@ -1,6 +1,9 @@
 #pragma once
 
+#include <string>
+
 #include "Providers.h"
+#include "providerutilities/Refusal.h"
 
 namespace ZR::DHCPClientGateway {
 
@@ -15,5 +18,10 @@ namespace ZR::DHCPClientGateway {
 /// CMPI_RC_ERR_ACCESS_DENIED or CMPI_RC_ERR_FAILED, and the reason, when the change did not
 /// take place.
 void modifyInstance(const Request& request, const CMPIInstance* wanted, const char** properties);
+
+/// Why the configuration name of an interface did not become what a client wants, as far as
+/// this process can see.
+[[nodiscard]] Refusal whyNameUnchanged(const std::string& interfaceName, const std::string& wanted,
+                                       const std::string& now);
 
 }  // namespace ZR::DHCPClientGateway

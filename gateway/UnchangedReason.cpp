@@ -1,4 +1,4 @@
-#include "UnchangedReason.h"
+#include "Modification.h"
 
 #include <string_view>
 

@@ -7,6 +7,7 @@
 #include <string>
 #include <utility>
 
+#include "cimom/OwnClass.h"
 #include "cimom/Status.h"
 
 namespace cimom {
@@ -31,5 +32,21 @@ Status guardedCall(const std::string& who, Call&& call) {
 
 /// The status when a request is nested too deep; OK otherwise.
 [[nodiscard]] Status checkDepth();
+
+/// Runs a function of an own class; what it throws becomes a status. The unwinding of a
+/// cancelled thread passes.
+template <typename Call>
+Status guardedOwn(const OwnClass& own, Call&& call) {
+    try {
+        std::forward<Call>(call)();
+        return {};
+    } catch (const abi::__forced_unwind&) {
+        throw;
+    } catch (const RequestRefused& refused) {
+        return {refused.code, refused.what()};
+    } catch (const std::exception& exception) {
+        return {CMPI_RC_ERR_FAILED, own.className() + ": " + exception.what()};
+    }
+}
 
 }  // namespace cimom

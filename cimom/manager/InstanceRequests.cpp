@@ -4,8 +4,8 @@
 #include "broker/objects/BrokerRecords.h"
 #include "cimom/ClassDeclaration.h"
 #include "cimom/Query.h"
+#include "manager/GuardedCall.h"
 #include "manager/ObjectManagerImplementation.h"
-#include "manager/OwnCall.h"
 #include "manager/PathMatch.h"
 #include "manager/RequestPath.h"
 

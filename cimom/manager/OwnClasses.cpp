@@ -5,8 +5,8 @@
 
 #include "cimom/ClassDeclaration.h"
 #include "manager/AssociationFilter.h"
+#include "manager/GuardedCall.h"
 #include "manager/ObjectManagerImplementation.h"
-#include "manager/OwnCall.h"
 #include "manager/PathMatch.h"
 
 namespace cimom {
