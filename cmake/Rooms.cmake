@@ -191,16 +191,17 @@ function(zr_test_headers)
 endfunction()
 
 # zr_test(NAME SOURCES file... [LINKS target...] [LABELS label...] [ENVIRONMENT NAME=value]
-#         [COST seconds] [SERIAL] [ONE_THREAD] [APART])
+#         [COST seconds] [SERIAL] [ONE_THREAD | THREADS_IN filter] [APART])
 # One test program. In a developer's build, each of its tests is a test of its own to ctest;
 # where its sources are compiled together, the program is one, unless APART is given: starting
 # it takes longer than most of its tests.
 # COST: what its longest takes, so that a machine with several processors begins with it.
 # SERIAL: no other test runs meanwhile. ONE_THREAD: nothing in it is used by two threads at
-# once, so that the thread sanitizer has nothing to find. APART: its tests need a process each,
+# once, so that the thread sanitizer has nothing to find; THREADS_IN: but for these of its
+# tests, and that sanitizer runs no other. APART: its tests need a process each,
 # or take so long that several run at once.
 function(zr_test name)
-    cmake_parse_arguments(TEST "SERIAL;ONE_THREAD;APART" "COST" "SOURCES;LINKS;LABELS;ENVIRONMENT" ${ARGN})
+    cmake_parse_arguments(TEST "SERIAL;ONE_THREAD;APART" "COST;THREADS_IN" "SOURCES;LINKS;LABELS;ENVIRONMENT" ${ARGN})
     if(NOT TARGET test_headers)
         zr_test_headers()
     endif()
@@ -237,7 +238,11 @@ function(zr_test name)
         list(APPEND properties ENVIRONMENT "${TEST_ENVIRONMENT}")
     endif()
     if(ZR_TESTS_COMPILED_TOGETHER AND NOT TEST_APART)
-        add_test(NAME ${name} COMMAND ${name} --gtest_brief=1)
+        set(filter "*")
+        if(TEST_THREADS_IN AND ZR_SANITIZERS MATCHES thread)
+            set(filter ${TEST_THREADS_IN})
+        endif()
+        add_test(NAME ${name} COMMAND ${name} --gtest_brief=1 --gtest_filter=${filter})
         set_tests_properties(${name} PROPERTIES ${properties} TIMEOUT 600)
     else()
         gtest_discover_tests(${name} DISCOVERY_MODE PRE_TEST PROPERTIES ${properties} TIMEOUT 120)
