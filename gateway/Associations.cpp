@@ -20,7 +20,7 @@ constexpr std::array accessPoints{"QVXZR_DHCPRemoteServiceAccessPoint"};
 constexpr std::array settings{"QVXZR_DHCPSettingData"};
 constexpr std::array assignments{"QVXZR_IPAssignmentSettingData"};
 
-std::string textOf(const Keys& keys, std::string_view name) {
+std::string keyText(const Keys& keys, std::string_view name) {
     return std::string(keys.text(name));
 }
 
@@ -33,15 +33,15 @@ std::string joined(std::string_view one, std::string_view other) {
 }
 
 std::string name(const Keys& keys) {
-    return textOf(keys, "Name");
+    return keyText(keys, "Name");
 }
 
 std::string systemName(const Keys& keys) {
-    return textOf(keys, "SystemName");
+    return keyText(keys, "SystemName");
 }
 
 std::string instanceId(const Keys& keys) {
-    return textOf(keys, "InstanceID");
+    return keyText(keys, "InstanceID");
 }
 
 std::string nameOnSystem(const Keys& keys) {
