@@ -61,14 +61,6 @@ std::string_view longNameOf(const CommandOption& option) {
     return found == longNames.end() ? option.longName : found->second;
 }
 
-/// Takes the first word off a text.
-std::string_view nextWord(std::string_view& text) {
-    text = trim(text);
-    const std::string_view word = text.substr(0, text.find(' '));
-    text.remove_prefix(word.size());
-    return word;
-}
-
 std::optional<InterfaceName> nameIn(std::string_view word) {
     return word.starts_with('[') ? std::nullopt : InterfaceName::from(word);
 }

@@ -10,16 +10,6 @@
 namespace ZR::Live {
 namespace {
 
-constexpr std::string_view blanks = " \t";
-
-/// Takes the first word off a text.
-std::string_view nextWord(std::string_view& text) {
-    text.remove_prefix(std::min(text.find_first_not_of(blanks), text.size()));
-    const std::string_view word = text.substr(0, text.find_first_of(blanks));
-    text.remove_prefix(word.size());
-    return word;
-}
-
 void addPatterns(std::string_view list, std::vector<std::string>& patterns) {
     while (!list.empty()) {
         const std::size_t end = std::min(list.find_first_of(" \t,"), list.size());

@@ -4,20 +4,12 @@
 #include <cstddef>
 
 #include "formats/ValueFormats.h"
+#include "zrcommon/Strings.h"
 
 namespace ZR::Live {
 namespace {
 
-constexpr std::string_view blanks = " \t";
 constexpr int hexadecimalBase = 16;
-
-/// Takes the next word off a text.
-std::string_view nextWord(std::string_view& text) {
-    text.remove_prefix(std::min(text.find_first_not_of(blanks), text.size()));
-    const std::string_view word = text.substr(0, text.find_first_of(blanks));
-    text.remove_prefix(word.size());
-    return word;
-}
 
 }  // namespace
 

@@ -27,6 +27,7 @@
 #include "formats/Trust.h"
 #include "formats/ValueFormats.h"
 #include "kernel/Sockets.h"
+#include "zrcommon/Strings.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace ZR::Live {
@@ -123,14 +124,6 @@ ManagerProcess::Where whereIs(int proc, std::string_view process, const std::str
 
 std::int32_t numberOf(std::string_view process) {
     return parseNumber<std::int32_t>(process).value_or(0);
-}
-
-/// Takes the next word off a text.
-std::string_view nextWord(std::string_view& text) {
-    text.remove_prefix(std::min(text.find_first_not_of(' '), text.size()));
-    const std::string_view word = text.substr(0, text.find(' '));
-    text.remove_prefix(word.size());
-    return word;
 }
 
 /// Whether a text of the form of /proc/PID/stat is that of a thread of the kernel.

@@ -14,6 +14,7 @@
 #include "formats/OptionWalk.h"
 #include "formats/Trust.h"
 #include "formats/ValueFormats.h"
+#include "zrcommon/Strings.h"
 
 namespace ZR::Live {
 namespace {
@@ -65,12 +66,8 @@ std::optional<std::uint16_t> codeOf(std::string_view name) {
 
 std::vector<std::uint16_t> codesOf(std::string_view names) {
     std::vector<std::uint16_t> codes;
-    constexpr std::string_view blanks = " \t\n";
     while (!names.empty()) {
-        names.remove_prefix(std::min(names.find_first_not_of(blanks), names.size()));
-        const std::string_view name = names.substr(0, names.find_first_of(blanks));
-        names.remove_prefix(name.size());
-        const auto code = codeOf(name);
+        const auto code = codeOf(nextWord(names, " \t\n"));
         if (code && std::find(codes.begin(), codes.end(), *code) == codes.end()) {
             codes.push_back(*code);
         }

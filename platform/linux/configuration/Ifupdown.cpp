@@ -17,16 +17,6 @@ namespace {
 // Files that include each other end here.
 constexpr int deepest = 10;
 
-constexpr std::string_view blanks = " \t";
-
-/// Takes the first word off a line.
-std::string_view takeWord(std::string_view& line) {
-    line.remove_prefix(std::min(line.find_first_not_of(blanks), line.size()));
-    const std::string_view word = line.substr(0, line.find_first_of(blanks));
-    line.remove_prefix(word.size());
-    return word;
-}
-
 /// Takes one line off a text, together with those that a "\" at the end adds.
 std::string takeLine(std::string_view& text) {
     std::string line;
@@ -155,12 +145,12 @@ InterfacesFile parseInterfaces(std::string_view text) {
         if (line.empty() || line.starts_with('#')) {
             continue;
         }
-        const std::string_view keyword = takeWord(line);
+        const std::string_view keyword = nextWord(line);
         if (keyword == "iface") {
             IfaceStanza stanza;
-            stanza.name = takeWord(line);
-            stanza.family = takeWord(line);
-            stanza.method = takeWord(line);
+            stanza.name = nextWord(line);
+            stanza.family = nextWord(line);
+            stanza.method = nextWord(line);
             inStanza = true;
             file.stanzas.push_back(std::move(stanza));
         } else if (keyword == "source" || keyword == "source-directory") {

@@ -135,4 +135,11 @@ std::string_view trim(std::string_view text) noexcept {
     return text.substr(first, text.find_last_not_of(blanks) - first + 1);
 }
 
+std::string_view nextWord(std::string_view& text, std::string_view blanks) noexcept {
+    text.remove_prefix(std::min(text.find_first_not_of(blanks), text.size()));
+    const std::string_view word = text.substr(0, text.find_first_of(blanks));
+    text.remove_prefix(word.size());
+    return word;
+}
+
 }  // namespace ZR

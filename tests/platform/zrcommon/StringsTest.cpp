@@ -149,6 +149,17 @@ TEST(Trim, TakesBlanksTabsAndCarriageReturnsOffBothEnds) {
     EXPECT_EQ(trim("\na\v"), "\na\v");
 }
 
+TEST(NextWord, TakesTheFirstWordAndTheBlanksBeforeIt) {
+    std::string_view text = " \tone two\nlines \t";
+    EXPECT_EQ(nextWord(text), "one");
+    EXPECT_EQ(text, " two\nlines \t");
+    EXPECT_EQ(nextWord(text), "two\nlines");
+    EXPECT_EQ(nextWord(text), "");
+    EXPECT_EQ(text, "");
+    text = "a\tb c";
+    EXPECT_EQ(nextWord(text, " "), "a\tb");
+}
+
 }  // namespace
 
 namespace {

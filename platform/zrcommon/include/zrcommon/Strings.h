@@ -21,4 +21,7 @@ namespace ZR {
 /// The text without blanks, tabs and carriage returns at its ends.
 [[nodiscard]] std::string_view trim(std::string_view text) noexcept;
 
+/// Takes the first word off a text, with the blanks before it; empty when there is none.
+std::string_view nextWord(std::string_view& text, std::string_view blanks = " \t") noexcept;
+
 }  // namespace ZR
