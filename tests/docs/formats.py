@@ -66,14 +66,16 @@ class Program:
 
 
 def told_types(program, properties, directory):
-    """The type that the program asks of each property: it tells so of one that is an object."""
-    types = {}
-    for name in properties:
+    """The type that the program asks of each property: it tells so of one that is an object.
+    Of one tree it tells sixteen slips at most."""
+    names, types = list(properties), {}
+    for begin in range(0, len(names), 16):
+        slips = {name: {} for name in names[begin:begin + 16]}
         tree = pathlib.Path(directory, "types.json")
-        tree.write_text(json.dumps({"nodes": [{"type": "x", "properties": {name: {}}}]}))
-        told = Program(program.path, str(tree)).run("show").stderr
-        types[name] = "".join(re.findall(r"must be (.*)", told))
-    return types
+        tree.write_text(json.dumps({"nodes": [{"type": "x", "properties": slips}]}))
+        told = Program(program.path, str(tree)).run("tree").stderr
+        types |= dict(re.findall(r'"(\w+)" must be (.*)', told))
+    return {name: types.get(name, "") for name in names}
 
 
 def first_words(rows):
