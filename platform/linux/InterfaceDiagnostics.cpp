@@ -2,16 +2,22 @@
 
 #include <algorithm>
 #include <string>
+#include <string_view>
 #include <utility>
 
 #include "LeaseRules.h"
 #include "zrclient/NodeLexicon.h"
+#include "zrcommon/BuiltSources.h"
 
 namespace ZR::Live {
 namespace {
 
 using Kind = Diagnostic::Kind;
 using NodeLexicon::Properties;
+
+/// Why a manager could not be asked.
+constexpr std::string_view silence =
+    Built::has("bus") ? " does not respond" : " is not asked by this build";
 
 /// The diagnostics of one interface, each of which begins with its name.
 class Teller {
@@ -42,10 +48,10 @@ class Teller {
         if (decidedOn(Properties::DHCPEnabled) == PropertyValue{}) {
             tell(Kind::Note,
                  std::string{nameOf(*(view_.unheard ? view_.unheard : view_.unheard6))} +
-                     " does not respond: whether it uses DHCP here cannot be told");
+                     std::string{silence} + ": whether it uses DHCP here cannot be told");
         } else if (decidedOn(Properties::AddressSource) == PropertyValue{}) {
-            tell(Kind::Note, std::string{nameOf(*view_.unheard6)} +
-                                 " does not respond: whether it has a lease cannot be told");
+            tell(Kind::Note, std::string{nameOf(*view_.unheard6)} + std::string{silence} +
+                                 ": whether it has a lease cannot be told");
         }
     }
 

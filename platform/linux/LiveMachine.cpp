@@ -75,6 +75,24 @@ void removeRepeated(std::vector<Diagnostic>& diagnostics) {
     });
 }
 
+auto processorOf(Surroundings& surroundings) {
+    if constexpr (Built::has("service-processor")) {
+        return IpmiReader{
+            surroundings.ipmi ? std::move(surroundings.ipmi) : ipmiDevice(surroundings.roots),
+            surroundings.uptime};
+    } else {
+        return NoIpmiReader{surroundings.roots};
+    }
+}
+
+/// Who asks for explanations hears what nothing was read for.
+void explainTheBuild(std::vector<Diagnostic>& diagnostics) {
+    if constexpr (!Built::leftOut.empty()) {
+        diagnostics.emplace_back("this build is without " + std::string{Built::leftOut},
+                                 Diagnostic::Kind::Note);
+    }
+}
+
 void reportToLog(std::string_view message) {
     TKLog::TKLogger::logLevelMessage("zrclient/LiveMachine", "read", __LINE__, "ZR.Instrumentation",
                                      LogLevel::failure, nullptr, 0, 0, message);
@@ -86,9 +104,7 @@ LiveMachine::LiveMachine(Surroundings surroundings)
     : surroundings_(std::move(surroundings)),
       buses_(std::move(surroundings_.buses)),
       network_(RtnetlinkReader{std::move(surroundings_.transport)}),
-      processor_(
-          surroundings_.ipmi ? std::move(surroundings_.ipmi) : ipmiDevice(surroundings_.roots),
-          surroundings_.uptime),
+      processor_(processorOf(surroundings_)),
       places_(fixedPlaces(surroundings_.roots)),
       unannounced_(surroundings_.roots) {
     if (!surroundings_.report) {
@@ -186,6 +202,9 @@ std::shared_ptr<const Snapshot> LiveMachine::tryToRead() {
         clients.diagnostics.emplace_back(std::move(system.diagnostic));
     }
     planAnotherTry(clients.diagnostics);
+    if (surroundings_.explain == Explain::Yes) {
+        explainTheBuild(clients.diagnostics);
+    }
     // The service processor is asked again at its own pace.
     std::optional<ServiceProcessor> processor = processor_.read(clients.diagnostics);
     removeRepeated(clients.diagnostics);
@@ -234,7 +253,7 @@ ClientFacts LiveMachine::readClients() {
         monitor_.begin(places_, facts.diagnostics);
         unannounced_.begin();
         for (const StateReader& reader : stateReaders()) {
-            reader.read(surroundings_.roots, facts);
+            readState(reader, surroundings_.roots, facts);
             if (reader.read == readProcesses) {
                 unannounced_.keepProcesses(facts);
             }

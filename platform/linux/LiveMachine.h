@@ -8,6 +8,7 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <type_traits>
 #include <unordered_set>
 #include <vector>
 
@@ -21,6 +22,7 @@
 #include "kernel/KeptNetwork.h"
 #include "kernel/NetlinkTransport.h"
 #include "zrclient/SnapshotSource.h"
+#include "zrcommon/BuiltSources.h"
 #include "zrlinux/LiveSource.h"
 
 namespace ZR::Live {
@@ -63,10 +65,10 @@ class LiveMachine final : public SnapshotSource {
 
     Surroundings surroundings_;
     ManagerBuses buses_;
-    ManagerSignals signals_;
+    std::conditional_t<Built::has("bus"), ManagerSignals, NoManagerSignals> signals_;
     KeptNetwork network_;
     ChangeMonitor monitor_;
-    IpmiReader processor_;
+    std::conditional_t<Built::has("service-processor"), IpmiReader, NoIpmiReader> processor_;
     Decided decided_;  // at the last reading; none where it is to be explained
     std::vector<WatchedPlace> places_;
     Unannounced unannounced_;

@@ -3,6 +3,7 @@
 #include <sys/types.h>
 
 #include <array>
+#include <string>
 #include <vector>
 
 #include "clients/Connman.h"
@@ -59,26 +60,93 @@ constexpr std::array ifupdownPlaces{StatePlace{ifupdownDirectory, ifupdownFile},
 constexpr std::array ifcfgPlaces{StatePlace{ifcfgDirectories[0], ifcfgPrefix},
                                  StatePlace{ifcfgDirectories[1], ifcfgPrefix}};
 
+/// What reads the state of a program; null where the build is without it.
+template <Client client>
+constexpr decltype(StateReader::read) readerOf() {
+    if constexpr (!isBuilt(client)) {
+        return nullptr;
+    } else if constexpr (client == Client::Networkd) {
+        return readNetworkd;
+    } else if constexpr (client == Client::NetworkManager) {
+        return readNetworkManager;
+    } else if constexpr (client == Client::Wicked) {
+        return readWicked;
+    } else if constexpr (client == Client::Connman) {
+        return readConnman;
+    } else if constexpr (client == Client::Dhclient) {
+        return readDhclient;
+    } else if constexpr (client == Client::Dhcpcd) {
+        return readDhcpcd;
+    } else if constexpr (client == Client::Udhcpc) {
+        return readUdhcpc;
+    } else if constexpr (client == Client::Ipconfig) {
+        return readIpconfig;
+    } else if constexpr (client == Client::KernelBoot) {
+        return readKernelBoot;
+    } else if constexpr (client == Client::Netplan) {
+        return readNetplan;
+    } else if constexpr (client == Client::Ifupdown) {
+        return readIfupdown;
+    } else {
+        static_assert(client == Client::Ifcfg);
+        return readIfcfg;
+    }
+}
+
+template <Client client>
+constexpr StateReader rowOf(std::span<const StatePlace> places) {
+    return {readerOf<client>(), places, client};
+}
+
 // Managers before the clients that they may start, and those before what is left of
 // the boot. The files of /proc cannot be watched.
 constexpr std::array readers{
     StateReader{readProcesses, dhcp6cPlaces},
-    StateReader{readNetworkd, networkdPlaces},
-    StateReader{readNetworkManager, networkManagerPlaces},
-    StateReader{readWicked, wickedPlaces},
-    StateReader{readConnman, connmanPlaces},
-    StateReader{readDhclient, dhclientPlaces},
-    StateReader{readDhcpcd, dhcpcdPlaces},
-    StateReader{readUdhcpc, udhcpcPlaces},
-    StateReader{readIpconfig, ipconfigPlaces},
-    StateReader{readKernelBoot, {}},
-    StateReader{readNetplan, netplanPlaces},
-    StateReader{readIfupdown, ifupdownPlaces},
-    StateReader{readIfcfg, ifcfgPlaces},
+    rowOf<Client::Networkd>(networkdPlaces),
+    rowOf<Client::NetworkManager>(networkManagerPlaces),
+    rowOf<Client::Wicked>(wickedPlaces),
+    rowOf<Client::Connman>(connmanPlaces),
+    rowOf<Client::Dhclient>(dhclientPlaces),
+    rowOf<Client::Dhcpcd>(dhcpcdPlaces),
+    rowOf<Client::Udhcpc>(udhcpcPlaces),
+    rowOf<Client::Ipconfig>(ipconfigPlaces),
+    rowOf<Client::KernelBoot>({}),
+    rowOf<Client::Netplan>(netplanPlaces),
+    rowOf<Client::Ifupdown>(ifupdownPlaces),
+    rowOf<Client::Ifcfg>(ifcfgPlaces),
     StateReader{readClientSockets, {}},
 };
 
+/// A file that lies in one of the places; empty without one. What cannot be listed is as if it
+/// were not there: nothing in it would be read.
+std::string findFile(std::span<const StatePlace> places, const Roots& roots) {
+    std::vector<Diagnostic> ignored;
+    for (const StatePlace& place : places) {
+        const std::string directory = roots.path(place.directory);
+        for (const std::string& name : listOptionalDirectory(directory, ignored)) {
+            if (name.starts_with(place.namePrefix)) {
+                return pathIn(directory, name);
+            }
+        }
+    }
+    return {};
+}
+
 }  // namespace
+
+void readState(const StateReader& reader, const Roots& roots, ClientFacts& facts) {
+    if (reader.read != nullptr) {
+        reader.read(roots, facts);
+        return;
+    }
+    const std::string file = findFile(reader.places, roots);
+    if (!file.empty()) {
+        facts.diagnostics.emplace_back("this build does not read what is of " +
+                                           std::string{nameOf(*reader.client)} + ", and there is " +
+                                           file,
+                                       Diagnostic::Kind::Note);
+    }
+}
 
 void readClientSockets(const Roots& roots, ClientFacts& facts) {
     std::vector<uid_t> users;

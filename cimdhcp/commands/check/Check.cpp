@@ -19,6 +19,7 @@
 #include "text/DisplayText.h"
 #include "text/Failure.h"
 #include "zrclient/InstrumentationService.h"
+#include "zrcommon/BuiltSources.h"
 #include "zrcommon/PlatformSettings.h"
 
 namespace cimdhcp {
@@ -105,6 +106,10 @@ class Examination {
             add(Verdict::notable, "machine", detail + ": the DHCP classes are empty",
                 "\"cimdhcp tree --explain\" shows what is seen, and from where; DHCP is on where a "
                 "client runs or the address came from one");
+        }
+        if constexpr (!ZR::Built::leftOut.empty()) {
+            add(Verdict::notable, "build", "it is without " + std::string(ZR::Built::leftOut),
+                "where the machine has one of these, use a build that has it, too (ZR_WITHOUT)");
         }
         for (Finding& finding : machineFindings(machine, now_)) {
             findings_.push_back(std::move(finding));

@@ -14,6 +14,8 @@ constexpr std::chrono::milliseconds timeToRespond{250};
 constexpr std::chrono::seconds firstPause{1};
 constexpr std::chrono::seconds longestPause{30};
 
+/// A template: where the build does not ask networkd, this is not to need what does.
+template <bool asked>
 std::string_view addNetworkd(std::string_view json, ClientFacts& facts) {
     const auto parsed = parseNetworkdDescription(json);
     if (const auto* const reason = std::get_if<std::string_view>(&parsed)) {
@@ -21,6 +23,23 @@ std::string_view addNetworkd(std::string_view json, ClientFacts& facts) {
     }
     addNetworkdDescription(std::get<NetworkdDescription>(parsed), startOfSystem(), facts);
     return {};
+}
+
+using Adding = std::string_view (*)(std::string_view json, ClientFacts& facts);
+
+/// What adds what a manager says; null where the build does not ask it.
+template <Client manager>
+constexpr Adding addingOf() {
+    if constexpr (!isAskable(manager)) {
+        return nullptr;
+    } else if constexpr (manager == Client::Networkd) {
+        return addNetworkd<isAskable(manager)>;
+    } else if constexpr (manager == Client::NetworkManager) {
+        return addNetworkManagerDescription;
+    } else {
+        static_assert(manager == Client::Connman);
+        return addConnmanServices;
+    }
 }
 
 /// Whether there is anything that a manager could tell. networkd runs on many a machine
@@ -35,10 +54,10 @@ bool isToBeAsked(const ClientFacts& facts, Client client) {
 }  // namespace
 
 ManagerBuses::ManagerBuses(Ways ways)
-    : managers_{
-          {{Client::Networkd, std::move(ways.networkd), addNetworkd},
-           {Client::NetworkManager, std::move(ways.networkManager), addNetworkManagerDescription},
-           {Client::Connman, std::move(ways.connman), addConnmanServices}}} {}
+    : managers_{{{Client::Networkd, std::move(ways.networkd), addingOf<Client::Networkd>()},
+                 {Client::NetworkManager, std::move(ways.networkManager),
+                  addingOf<Client::NetworkManager>()},
+                 {Client::Connman, std::move(ways.connman), addingOf<Client::Connman>()}}} {}
 
 /// Adds what it says; false when it says nothing that can be used.
 bool ManagerBuses::hear(const Manager& manager, std::string_view json, ClientFacts& facts) {
@@ -74,7 +93,10 @@ void ManagerBuses::consult(ClientFacts& facts, Time now) {
         }
         facts.unheardManagers.push_back(manager.client);
         if (!manager.reason.empty()) {
-            facts.diagnostics.emplace_back(manager.reason);
+            // It does not come to an end where the build does not ask.
+            facts.diagnostics.emplace_back(manager.reason, Built::has("bus")
+                                                               ? Diagnostic::Kind::Unreadable
+                                                               : Diagnostic::Kind::Note);
         }
     }
 }

@@ -9,6 +9,7 @@
 #include "clients/BusRequest.h"
 #include "clients/NetworkdBus.h"
 #include "facts/ClientFacts.h"
+#include "zrcommon/BuiltSources.h"
 
 namespace ZR::Live {
 
@@ -29,6 +30,34 @@ namespace ZR::Live {
 /// names no servers and no times. Returns why the text cannot be used, empty when it can.
 [[nodiscard]] std::string_view addConnmanServices(std::string_view json, ClientFacts& facts);
 
+/// Whether the build has what asks a manager over the system bus.
+[[nodiscard]] constexpr bool isAskable(Client manager) {
+    return Built::has("bus") && isBuilt(manager);
+}
+
+/// In place of asking one.
+template <Client manager>
+[[nodiscard]] BusResponse doNotAsk(BusRequests::Deadline /*deadline*/) {
+    return {.json = {},
+            .reason = std::string{nameOf(manager)} +
+                      " runs, which this build does not ask over the system bus"};
+}
+
+using WayToAsk = BusResponse (*)(BusRequests::Deadline);
+template <Client manager>
+[[nodiscard]] constexpr WayToAsk wayToAsk() {
+    if constexpr (!isAskable(manager)) {
+        return doNotAsk<manager>;
+    } else if constexpr (manager == Client::Networkd) {
+        return askNetworkd;
+    } else if constexpr (manager == Client::NetworkManager) {
+        return askNetworkManager;
+    } else {
+        static_assert(manager == Client::Connman);
+        return askConnman;
+    }
+}
+
 /// Asks those managers over the system bus that run and can be asked there: they know more
 /// than their files tell. One that does not respond in time is left alone for a while, as
 /// each request to it would make a reading wait: for a second, and twice as long each time
@@ -41,9 +70,9 @@ class ManagerBuses {
 
     /// How each is asked; one without a way is not.
     struct Ways {
-        Ask networkd = askNetworkd;
-        Ask networkManager = askNetworkManager;
-        Ask connman = askConnman;
+        Ask networkd = wayToAsk<Client::Networkd>();
+        Ask networkManager = wayToAsk<Client::NetworkManager>();
+        Ask connman = wayToAsk<Client::Connman>();
     };
 
     explicit ManagerBuses(Ways ways);

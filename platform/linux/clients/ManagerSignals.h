@@ -47,4 +47,12 @@ class ManagerSignals {
     int descriptor_ = -1;
 };
 
+/// In its place in a build that does not use the bus: nothing is ever heard.
+struct NoManagerSignals {
+    static void follow(const ClientFacts& /*facts*/) noexcept {}
+    [[nodiscard]] static bool connect(ManagerSignals::Time /*now*/) noexcept { return false; }
+    [[nodiscard]] static int descriptor() noexcept { return -1; }
+    [[nodiscard]] static bool heard() noexcept { return false; }
+};
+
 }  // namespace ZR::Live

@@ -35,31 +35,61 @@ namespace {
 
 constexpr std::string_view dhcpcdName = "dhcpcd";
 
+using ArgumentParser = std::optional<ClientProcess> (*)(std::span<const std::string_view>);
+
+/// What understands the command line of a client; null where the build is without it.
+template <Client client>
+constexpr ArgumentParser parserOf() {
+    if constexpr (!isBuilt(client)) {
+        return nullptr;
+    } else if constexpr (client == Client::Dhclient) {
+        return parseDhclientArguments;
+    } else if constexpr (client == Client::Dhcpcd) {
+        return parseDhcpcdArguments;
+    } else if constexpr (client == Client::Udhcpc) {
+        return parseUdhcpcArguments;
+    } else {
+        static_assert(client == Client::Dhcp6c);
+        return parseDhcp6cArguments;
+    }
+}
+
 /// Which process name is which client, and who understands its command line.
 struct KnownClient {
     std::string_view name;  // as /proc/PID/comm has it: at most 15 bytes
-    std::optional<ClientProcess> (*parse)(std::span<const std::string_view> arguments);
+    Client client;
+    ArgumentParser parse;
 };
+constexpr std::string_view manyPrograms = "busybox";
 constexpr std::array<KnownClient, 6> knownClients{{
-    {"dhclient", parseDhclientArguments},
-    {dhcpcdName, parseDhcpcdArguments},
-    {"udhcpc", parseUdhcpcArguments},
-    {"udhcpc6", parseUdhcpcArguments},
-    {"busybox", parseUdhcpcArguments},
-    {"dhcp6c", parseDhcp6cArguments},
+    {"dhclient", Client::Dhclient, parserOf<Client::Dhclient>()},
+    {dhcpcdName, Client::Dhcpcd, parserOf<Client::Dhcpcd>()},
+    {"udhcpc", Client::Udhcpc, parserOf<Client::Udhcpc>()},
+    {"udhcpc6", Client::Udhcpc, parserOf<Client::Udhcpc>()},
+    {manyPrograms, Client::Udhcpc, parserOf<Client::Udhcpc>()},
+    {"dhcp6c", Client::Dhcp6c, parserOf<Client::Dhcp6c>()},
 }};
 
 /// Which process name is which program that manages links.
 struct KnownManager {
     std::string_view name;  // as /proc/PID/comm has it: at most 15 bytes
     Client client;
+    bool built;
 };
 constexpr std::array<KnownManager, 4> knownManagers{{
-    {"systemd-network", Client::Networkd},  // systemd-networkd, cut off
-    {"NetworkManager", Client::NetworkManager},
-    {"wickedd-dhcp4", Client::Wicked},
-    {"connmand", Client::Connman},
+    {"systemd-network", Client::Networkd, isBuilt(Client::Networkd)},  // systemd-networkd, cut off
+    {"NetworkManager", Client::NetworkManager, isBuilt(Client::NetworkManager)},
+    {"wickedd-dhcp4", Client::Wicked, isBuilt(Client::Wicked)},
+    {"connmand", Client::Connman, isBuilt(Client::Connman)},
 }};
+
+/// Of a program of which nothing is read but that it runs.
+Diagnostic notRead(Client client) {
+    return Diagnostic{std::string{nameOf(client)} +
+                          " runs, which this build does not read: on which links it uses DHCP "
+                          "cannot be told",
+                      Diagnostic::Kind::Note};
+}
 
 /// A path below /proc without an allocation: there are many processes.
 class ProcessPath {
@@ -194,7 +224,6 @@ bool sharesUserNamespace(int proc, std::string_view process) {
 /// Whether its program could be the one of that name. Any user can give the name and the
 /// arguments of a client to another program, which may be one that has privileges of its own.
 bool hasTheProgram(int proc, std::string_view process, std::string_view name) {
-    constexpr std::string_view manyPrograms = "busybox";
     const std::string program = readLink(proc, ProcessPath{process, "/exe"}.get());
     const std::string_view file = std::string_view{program}.substr(program.rfind('/') + 1);
     return program.empty() || file.starts_with(name) || file.starts_with(manyPrograms);
@@ -229,8 +258,10 @@ Diagnostic implausible(std::string_view process, std::string_view name, std::str
 /// Reads all processes of a directory like /proc.
 class Reader {
   public:
-    Reader(const Roots& roots, Directory& directory, ClientFacts& facts)
+    Reader(const Roots& roots, Directory& directory, std::span<const Client> unread,
+           ClientFacts& facts)
         : roots_(roots),
+          unread_(unread),
           directory_(directory),
           proc_(directory.descriptor()),
           // Of this thread: namespaces belong to threads, not to processes.
@@ -262,6 +293,7 @@ class Reader {
         ClientProcess process;
         ProcessStatus status;
         std::string doubt;
+        bool read = true;  // what it does is known
     };
     /// A process of dhcpcd, which is one program in several processes: what it heard and may
     /// do is spread over them.
@@ -307,7 +339,13 @@ class Reader {
                               .hearsOthers = !arguments.empty() &&
                                              arguments.front().starts_with("dhcpcd: [BPF ARP]")});
         }
-        auto found = client.parse(arguments);
+        const bool read = client.parse != nullptr && isRead(client.client);
+        std::optional<ClientProcess> found;
+        if (read) {
+            found = client.parse(arguments);
+        } else if (client.name != manyPrograms || isUdhcpc(arguments)) {
+            found = ofAllLinks(client.client, 0, 0);
+        }
         if (!found) {
             return;
         }
@@ -317,7 +355,27 @@ class Reader {
                                .name = client.name,
                                .process = *std::move(found),
                                .status = *status,
-                               .doubt = std::move(doubt)});
+                               .doubt = std::move(doubt),
+                               .read = read});
+    }
+
+    [[nodiscard]] bool isRead(Client client) const {
+        return std::find(unread_.begin(), unread_.end(), client) == unread_.end();
+    }
+
+    /// A client of which no more is known: any link may be its.
+    static ClientProcess ofAllLinks(Client client, std::int32_t pid, std::uint32_t user) {
+        return {.client = client, .interfaces = {}, .leaseFile = {}, .pid = pid, .user = user};
+    }
+
+    static bool isUdhcpc(std::span<const std::string_view> arguments) {
+        return arguments.size() > 1 && arguments[1].starts_with("udhcpc");
+    }
+
+    /// Who asks what is known then hears that it is not known, as of a client that is hidden.
+    void addUnread(ClientProcess process) {
+        facts_.diagnostics.push_back(notRead(process.client));
+        facts_.hiddenClients.push_back(std::move(process));
     }
 
     void readManager(std::string_view process, const KnownManager& manager) {
@@ -327,7 +385,11 @@ class Reader {
         }
         const auto where = whereIs(proc_, process, ownNamespace_);
         const std::string doubt = doubtOf(proc_, process, manager.name, *status);
-        if (doubt.empty()) {
+        if (doubt.empty() && !(manager.built && isRead(manager.client))) {
+            if (where != ManagerProcess::Where::Elsewhere) {
+                addUnread(ofAllLinks(manager.client, numberOf(process), status->user));
+            }
+        } else if (doubt.empty()) {
             facts_.managers.push_back({.client = manager.client,
                                        .where = where,
                                        .pid = numberOf(process),
@@ -346,9 +408,11 @@ class Reader {
         if (!candidate.doubt.empty() && !hasPartOfRoot(candidate)) {
             facts_.diagnostics.push_back(
                 implausible(candidate.number, candidate.name, candidate.doubt));
-        } else if (where == ManagerProcess::Where::Here) {
+        } else if (where == ManagerProcess::Where::Here && candidate.read) {
             candidate.process.heardLinks = heardBy(candidate);
             facts_.processes.push_back(std::move(candidate.process));
+        } else if (where == ManagerProcess::Where::Here) {
+            addUnread(std::move(candidate.process));
         } else if (error == EACCES || error == EPERM) {
             facts_.diagnostics.emplace_back(
                 "cannot tell the links of process " + candidate.number + " (" +
@@ -438,6 +502,7 @@ class Reader {
     }
 
     const Roots& roots_;
+    std::span<const Client> unread_;
     Directory& directory_;
     const int proc_;
     const std::string ownNamespace_;
@@ -450,12 +515,16 @@ class Reader {
 }  // namespace
 
 void readProcesses(const Roots& roots, ClientFacts& facts) {
+    readProcessesExcept({}, roots, facts);
+}
+
+void readProcessesExcept(std::span<const Client> unread, const Roots& roots, ClientFacts& facts) {
     Directory directory{roots.proc};
     if (!directory) {
         facts.diagnostics.push_back(unreadable(roots.proc, errno));
         return;
     }
-    Reader{roots, directory, facts}.readAll();
+    Reader{roots, directory, unread, facts}.readAll();
 }
 
 }  // namespace ZR::Live

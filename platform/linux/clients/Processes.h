@@ -2,6 +2,7 @@
 
 #include <cstdint>
 #include <optional>
+#include <span>
 #include <string_view>
 
 #include "facts/ClientFacts.h"
@@ -33,6 +34,12 @@ struct ProcessStatus {
 /// Clients whose network namespace may not be read are the hidden ones, each with a
 /// diagnostic. Of any other process nothing but its name is read, and of the kernel's own
 /// threads not even that.
+///
+/// A program that the build does not read is one of the hidden clients, with a note: any link
+/// may be its.
 void readProcesses(const Roots& roots, ClientFacts& facts);
+
+/// The same, with programs that are not to be read although the build could.
+void readProcessesExcept(std::span<const Client> unread, const Roots& roots, ClientFacts& facts);
 
 }  // namespace ZR::Live

@@ -37,7 +37,8 @@ struct ClientFacts {
     std::vector<Client> unheardManagers;
     /// Indexes of the links that NetworkManager's files say it leaves alone.
     std::vector<std::uint32_t> unmanagedLinks;
-    /// Clients of which this user may not know whether they run in this network namespace.
+    /// Clients of which this user may not know whether they run in this network namespace, and
+    /// programs that run and are not read by this build.
     std::vector<ClientProcess> hiddenClients;
     bool processesHidden = false;  ///< those of other users, as by hidepid=2 (proc(5))
     ClientSockets sockets;

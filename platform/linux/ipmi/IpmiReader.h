@@ -1,13 +1,18 @@
 #pragma once
 
+#include <unistd.h>
+
 #include <chrono>
 #include <functional>
 #include <memory>
 #include <optional>
 #include <string>
+#include <string_view>
 #include <vector>
 
+#include "formats/Files.h"
 #include "ipmi/IpmiConversation.h"
+#include "ipmi/IpmiDevice.h"
 #include "ipmi/IpmiTransport.h"
 #include "ipmi/ServiceProcessor.h"
 #include "zrclient/Diagnostic.h"
@@ -69,6 +74,33 @@ class IpmiReader {
     Knowledge known_;
     Knowledge given_;
     int failures_ = 0;  // in a row
+};
+
+/// In its place in a build that does not read service processors.
+class NoIpmiReader {
+  public:
+    explicit NoIpmiReader(const Roots& roots) : roots_(roots) {}
+
+    [[nodiscard]] static bool changed() noexcept { return false; }
+    [[nodiscard]] static bool awaiting() noexcept { return false; }
+    [[nodiscard]] static std::chrono::steady_clock::duration rest() noexcept {
+        return std::chrono::hours{1};
+    }
+    /// Always nullopt; with a note where the machine has one.
+    [[nodiscard]] std::optional<ServiceProcessor> read(std::vector<Diagnostic>& diagnostics) const {
+        for (const std::string_view device : ipmiDevices) {
+            const std::string path = roots_.path(device);
+            if (::access(path.c_str(), F_OK) == 0) {
+                diagnostics.emplace_back(
+                    "this build does not read service processors, and there is " + path,
+                    Diagnostic::Kind::Note);
+            }
+        }
+        return std::nullopt;
+    }
+
+  private:
+    Roots roots_;
 };
 
 }  // namespace ZR::Live

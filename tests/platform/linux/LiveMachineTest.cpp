@@ -8,6 +8,7 @@
 #include <gtest/gtest.h>
 #include <linux/if_addr.h>
 
+#include <array>
 #include <memory>
 
 #include "LinuxSupport.h"
@@ -15,6 +16,7 @@
 #include "StateReaders.h"
 #include "kit/Diagnostics.h"
 #include "kit/HostNameFake.h"
+#include "zrcommon/BuiltSources.h"
 #include "zrcommon/SystemName.h"
 #include "zrlinux/LiveSource.h"
 
@@ -554,6 +556,43 @@ TEST_F(LiveMachineTest, WirelessDevicesAreDescribedAsSuch) {
             .read();
     EXPECT_EQ(tree->node(interfaceNode(*tree, "wlan0")).description, "Wireless interface");
     EXPECT_EQ(tree->node(interfaceNode(*tree, "eth0")).description, "Ethernet interface");
+}
+
+TEST(StateReaders, FilesOfWhatABuildDoesNotReadAreTold) {
+    const TemporaryDirectory root;
+    const Roots roots{.files = root.path(""), .proc = root.path("/proc")};
+    constexpr std::array places{StatePlace{"/var/lib/none", ""}, StatePlace{"/run", "dhclient"}};
+    const StateReader without{nullptr, places, Client::Dhclient};
+    ClientFacts facts;
+    root.write("/run/other", "");
+    readState(without, roots, facts);
+    EXPECT_THAT(ZR::Testing::textsOf(facts.diagnostics), IsEmpty());
+    root.write("/run/dhclient.eth0.pid", "");
+    readState(without, roots, facts);
+    EXPECT_THAT(ZR::Testing::textsOf(facts.diagnostics),
+                ElementsAre("this build does not read what is of dhclient, and there is " +
+                            root.path("/run/dhclient.eth0.pid")));
+}
+
+TEST(StateReaders, AFullBuildHasAReaderOfEverything) {
+    for (const StateReader& reader : stateReaders()) {
+        EXPECT_NE(reader.read, nullptr);
+    }
+    EXPECT_EQ(Built::leftOut, "");
+}
+
+TEST(NoIpmiReader, TellsThatThereIsAServiceProcessor) {
+    const TemporaryDirectory root;
+    const NoIpmiReader reader{Roots{.files = root.path(""), .proc = root.path("/proc")}};
+    std::vector<ZR::Diagnostic> diagnostics;
+    EXPECT_EQ(reader.read(diagnostics), std::nullopt);
+    EXPECT_THAT(ZR::Testing::textsOf(diagnostics), IsEmpty());
+    root.write("/dev/ipmi/0", "");
+    EXPECT_EQ(reader.read(diagnostics), std::nullopt);
+    EXPECT_THAT(ZR::Testing::textsOf(diagnostics),
+                ElementsAre("this build does not read service processors, and there is " +
+                            root.path("/dev/ipmi/0")));
+    EXPECT_FALSE(NoIpmiReader::changed());
 }
 
 TEST(LiveSource, ReadsThisMachine) {

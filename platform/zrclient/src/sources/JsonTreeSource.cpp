@@ -9,6 +9,7 @@
 #include "sources/JsonTree.h"
 #include "tklogger/TKLogger.h"
 #include "zrclient/TreeFile.h"
+#include "zrcommon/BuiltSources.h"
 #include "zrcommon/Errno.h"
 #include "zrcommon/File.h"
 #include "zrcommon/LogLevel.h"
@@ -23,8 +24,8 @@ constexpr std::size_t largestFile = std::size_t{10} << 20U;
 
 /// Whether what made the reading fail lies in the file, so that the watch tells
 /// when it may be over. Too many open files, or a directory without permission,
-/// come to an end unseen.
-bool isOfTheFile(int error) {
+/// come to an end unseen. A build that does not read trees does not use it.
+[[maybe_unused]] bool isOfTheFile(int error) {
     return error == ENOENT || error == ENOTDIR || error == EISDIR || error == EINVAL ||
            error == EFBIG;
 }
@@ -65,25 +66,29 @@ std::shared_ptr<const Snapshot> JsonTreeSource::read() {
 }
 
 std::shared_ptr<const Snapshot> JsonTreeSource::tryToRead() {
-    const auto text = File::read(watch_.path(), largestFile);
-    if (!text) {
-        const int reason = errno;
-        readAgain_ = !isOfTheFile(reason);
-        return unusable(": " + reasonOf(reason));
-    }
-    const SystemName system = readSystemName();
-    nameless_ = system.name.empty();
-    JsonTree tree = parseJsonTree(*text, system.name, name_);
-    if (const auto* fault = std::get_if<JsonTreeFault>(&tree)) {
-        return unusable(":" + std::to_string(fault->line) + ":" + std::to_string(fault->column) +
-                        ": " + fault->reason);
-    }
-    if (nameless_) {
-        report(system.diagnostic);
+    if constexpr (Built::has("json-tree")) {
+        const auto text = File::read(watch_.path(), largestFile);
+        if (!text) {
+            const int reason = errno;
+            readAgain_ = !isOfTheFile(reason);
+            return unusable(": " + reasonOf(reason));
+        }
+        const SystemName system = readSystemName();
+        nameless_ = system.name.empty();
+        JsonTree tree = parseJsonTree(*text, system.name, name_);
+        if (const auto* fault = std::get_if<JsonTreeFault>(&tree)) {
+            return unusable(":" + std::to_string(fault->line) + ":" +
+                            std::to_string(fault->column) + ": " + fault->reason);
+        }
+        if (nameless_) {
+            report(system.diagnostic);
+        } else {
+            lastReported_.clear();
+        }
+        return std::get<std::shared_ptr<const Snapshot>>(std::move(tree));
     } else {
-        lastReported_.clear();
+        return unusable(": this build does not read trees");
     }
-    return std::get<std::shared_ptr<const Snapshot>>(std::move(tree));
 }
 
 std::shared_ptr<const Snapshot> JsonTreeSource::unusable(const std::string& reason) {

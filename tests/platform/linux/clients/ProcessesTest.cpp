@@ -12,6 +12,7 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <array>
 #include <csignal>
 #include <iomanip>
 #include <sstream>
@@ -550,6 +551,37 @@ TEST(HiddenProcesses, OfARealKernel) {
             EXPECT_EQ(clientsFound(), 1U) << "nothing is hidden from root";
         }
     }));
+}
+
+TEST_F(ProcessesTest, WhatABuildDoesNotReadIsHiddenAndTold) {
+    add("11", "dhcpcd", "dhcpcd: eth1 [ip4] [ip6]");
+    add("12", "dhcpcd", "dhcpcd: [BPF BOOTP] eth1");
+    add("13", "busybox", std::string{"busybox\0udhcpc\0-i\0eth3\0", 23});
+    add("14", "busybox", std::string{"busybox\0sh\0", 11});
+    add("15", "NetworkManager", "");
+    add("16", "dhclient", commandLine_);
+    add("17", "connmand", "", "net:[2]");
+    ClientFacts facts;
+    readProcessesExcept(
+        std::array{Client::Dhcpcd, Client::Udhcpc, Client::NetworkManager, Client::Connman},
+        {.files = "", .proc = proc_.path()}, facts);
+    std::vector<std::pair<Client, std::int32_t>> hidden;
+    for (const ClientProcess& process : facts.hiddenClients) {
+        EXPECT_THAT(process.interfaces, IsEmpty()) << "any link may be its";
+        hidden.emplace_back(process.client, process.pid);
+    }
+    EXPECT_THAT(hidden, testing::UnorderedElementsAre(
+                            std::pair{Client::Dhcpcd, 11}, std::pair{Client::Dhcpcd, 12},
+                            std::pair{Client::Udhcpc, 13}, std::pair{Client::NetworkManager, 15}));
+    EXPECT_THAT(facts.processes, ElementsAre(testing::Field(&ClientProcess::pid, 16)));
+    EXPECT_THAT(facts.managers, IsEmpty()) << "what is not read is not asked either";
+    const std::string rest =
+        " runs, which this build does not read: on which links it uses DHCP cannot be told";
+    EXPECT_THAT(ZR::Testing::textsOf(facts.diagnostics),
+                testing::UnorderedElementsAre("dhcpcd" + rest, "dhcpcd" + rest, "udhcpc" + rest,
+                                              "NetworkManager" + rest));
+    EXPECT_THAT(facts.diagnostics,
+                testing::Each(testing::Field(&ZR::Diagnostic::kind, ZR::Diagnostic::Kind::Note)));
 }
 
 TEST_F(ProcessesTest, WithoutAProcessFileSystemThereIsAReason) {
