@@ -54,6 +54,17 @@ for type in sfcb pegasus; do
     check "$type: taking out again" env DESTDIR="$stage" "$program" -t "$type" -d
 done
 
+# As packages do when they are removed one by one.
+own=$(dirname "$program")/schema
+for type in sfcb pegasus; do
+    stage=$directory/$type
+    DESTDIR=$stage "$program" -t "$type" --exact
+    for library in DHCPClientNeighbours DHCPClientProvider; do
+        DESTDIR=$stage "$program" -t "$type" -d -r "$own/exact/$library.registration"
+    done
+    check "$type: the last form leaves nothing" test -z "$(find "$stage" -mindepth 1)"
+done
+
 # What the user names counts.
 stage=$directory/named
 mkdir "$stage"
@@ -326,7 +337,7 @@ settle sfcbrepos
 ends 0 --exact
 echo old >"$state/var/lib/sfcb/stage/regs/DHCPClientProvider.reg"
 ends 0 --refresh
-check "refreshing leaves the form that is registered" test "$(ls "$state/var/lib/sfcb/stage/regs" | xargs)" == \
+check "refreshing leaves the form that is registered" test "$(cd "$state/var/lib/sfcb/stage/regs" && echo *)" == \
     "DHCPClientNeighbours.reg DHCPClientProvider.reg"
 check "and makes it new" grep -q '^\[' "$state/var/lib/sfcb/stage/regs/DHCPClientProvider.reg"
 ends 2 --refresh --exact
