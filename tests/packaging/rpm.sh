@@ -5,8 +5,8 @@
 # ends with the test. What rpm needs from outside is given by a package that says that it has it.
 # Usage: rpm.sh BUILD_DIRECTORY TREE   with what that build has made
 #        rpm.sh --whole DIRECTORY TREE  builds everything with rpmbuild from an archive of the sources
-#                                       below DIRECTORY first, which takes minutes, and goes on with
-#                                       that build
+#                                       first, in DIRECTORY/rpmbuild, which takes minutes, and goes on
+#                                       with that build; so without arguments, in build/everywhere
 set -euo pipefail
 
 source=$(cd "$(dirname "$0")/../.." && pwd)
@@ -17,9 +17,10 @@ for tool in rpmbuild rpmlint; do
         exit 77
     }
 done
+(($# > 0)) || set -- --whole "$source/build/everywhere/rpm" "$source/docs/sample-machine.json"
 whole=
 if [[ $1 == --whole ]]; then
-    whole=$(mkdir -p "$2" && cd "$2" && pwd)
+    whole=$(mkdir -p "$2" && cd "$2" && pwd)/rpmbuild
     shift
 fi
 build=$1
@@ -72,7 +73,7 @@ if [[ -n $whole ]]; then
             exit 1
         }
     done
-    build=$(echo "$whole/BUILD/dhcp-client-provider-$version"/*-build)
+    build=$(find "$whole/BUILD" -maxdepth 3 -name CMakeCache.txt -printf '%h\n')
 fi
 
 # Stripped by the spec's own steps, and compressed quickly.
@@ -186,10 +187,12 @@ grep LOG_LEVEL /etc/zr/platform.conf.rpmnew
 rm /etc/zr/platform.conf.rpmnew
 grep -c '^\[' /usr/local/var/lib/sfcb/stage/regs/DHCPClientProvider.reg
 registered
-echo "== remove"
+echo "== remove: what the administrator has made stays"
 install -e $(rpm -qa | grep -v ^machine)
 registered
-echo "== in the other order, the exact form is registered"
+find /etc/zr /var/lib/dhcp-client-provider -type f
+rm /etc/zr/platform.conf.rpmsave /var/lib/dhcp-client-provider/ifcfg-eth0
+echo "== in the other order, the exact form is registered, and nothing stays at all"
 install -i next/dhcp-client-provider-schema-*.rpm next/cmpi-dhcp-client-{provider,neighbours}-*.rpm
 install -i next/cmpi-dhcp-client-[0-9]*.rpm
 registered
@@ -237,7 +240,6 @@ unshare --mount bash "$directory/outside" "$directory" "$tree" >>"$directory/out
     cat "$directory/output" "$directory/errors"
     exit 1
 }
-# What the administrator has made stays.
 cat >"$directory/expected" <<'TEXT'
 == needs
 /bin/sh
@@ -293,11 +295,13 @@ LOG_LEVEL=4000
 ./regs/DHCPClientProvider.reg
 sfcbrepos -f
 mark-restart-system-units cimdhcp.service cimdhcp-exporter.service
-== remove
+== remove: what the administrator has made stays
 sfcbrepos -f
 sfcbrepos -f
 remove-system-units cimdhcp.service cimdhcp-exporter.service cimdhcp-metrics.service cimdhcp-metrics.timer
-== in the other order, the exact form is registered
+/etc/zr/platform.conf.rpmsave
+/var/lib/dhcp-client-provider/ifcfg-eth0
+== in the other order, the exact form is registered, and nothing stays at all
 ./mofs/root/cimv2/10-dhcp-client.mof
 ./mofs/root/cimv2/11-dhcp-extensions.mof
 ./mofs/root/cimv2/12-dhcp-profile.mof
@@ -308,8 +312,5 @@ sfcbrepos -f
 sfcbrepos -f
 sfcbrepos -f
 == left behind
-./etc/zr
-./etc/zr/platform.conf.rpmsave
-./var/lib/dhcp-client-provider/ifcfg-eth0
 TEXT
 diff "$directory/expected" "$directory/output"
