@@ -23,8 +23,8 @@ if [[ $1 == --whole ]]; then
     whole=$(mkdir -p "$2" && cd "$2" && pwd)/rpmbuild
     shift
 fi
-build=$1
-tree=$2
+build=$(realpath "$1")
+tree=$(realpath "$2")
 directory=$(mktemp -d)
 trap 'rm -rf "$directory"' EXIT
 

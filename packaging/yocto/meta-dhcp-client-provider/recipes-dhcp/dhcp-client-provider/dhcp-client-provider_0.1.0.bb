@@ -30,7 +30,7 @@ EXTRA_OECMAKE = "-DCMAKE_BUILD_TYPE=Release -DBUILD_TESTING=OFF -DZR_COMPILED_TO
 
 do_install:append() {
     # What Debian's packages have.
-    rm -r ${D}${datadir}/lintian ${D}${docdir}/*/changelog*
+    rm -rf ${D}${datadir}/lintian ${D}${docdir}/*/changelog*
     if [ ${systemd_system_unitdir} != ${prefix}/lib/systemd/system ]; then
         install -d ${D}${systemd_system_unitdir}
         mv ${D}${prefix}/lib/systemd/system/* ${D}${systemd_system_unitdir}
