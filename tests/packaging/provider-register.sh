@@ -177,7 +177,8 @@ Registers CMPI providers with an object manager, or takes them out again.
   --interop NAMESPACE
                 the interop namespace of OpenPegasus; asked for when not given
   -d            take the providers out
-  --refresh     bring up to date what is registered, and register nothing else
+  --refresh     bring up to date what is registered for the same namespaces, and register
+                nothing else
   -v            say what is done
   -h            print this help
 
@@ -335,11 +336,16 @@ check "the registration is the new one" grep -qx '   provider: NewThings' "$stat
 sed -i 's/provider: .*/provider: Things/' "$directory/one.registration"
 settle sfcbrepos
 ends 0 --exact
-echo old >"$state/var/lib/sfcb/stage/regs/DHCPClientProvider.reg"
+sed -i 's/provider: .*/provider: Old/' "$state/var/lib/sfcb/stage/regs/DHCPClientProvider.reg"
 ends 0 --refresh
 check "refreshing leaves the form that is registered" test "$(cd "$state/var/lib/sfcb/stage/regs" && echo *)" == \
     "DHCPClientNeighbours.reg DHCPClientProvider.reg"
-check "and makes it new" grep -q '^\[' "$state/var/lib/sfcb/stage/regs/DHCPClientProvider.reg"
+check "and makes it new" bash -c "! grep -q Old '$state/var/lib/sfcb/stage/regs/DHCPClientProvider.reg'"
+ends 0 --exact -n root/other
+: >"$state/called"
+ends 0 --refresh
+called "refreshing leaves the namespace that was chosen" <<'TEXT'
+TEXT
 ends 2 --refresh --exact
 ends 2 --refresh -d
 

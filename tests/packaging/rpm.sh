@@ -179,13 +179,13 @@ echo "== upgrade: what was changed and chosen stays"
 echo LOG_LEVEL=4000 >/etc/zr/platform.conf
 /usr/share/dhcp-client-provider/provider-register.sh --exact
 rm /told
-echo old >/usr/local/var/lib/sfcb/stage/regs/DHCPClientProvider.reg
+sed -i 's/provider: .*/provider: Old/' /usr/local/var/lib/sfcb/stage/regs/DHCPClientProvider.reg
 install -U next/*.rpm
 rpm -qa --qf '%{NAME}-%{VERSION}-%{RELEASE}\n' | LC_ALL=C sort
 cat /etc/zr/platform.conf
 grep LOG_LEVEL /etc/zr/platform.conf.rpmnew
 rm /etc/zr/platform.conf.rpmnew
-grep -c '^\[' /usr/local/var/lib/sfcb/stage/regs/DHCPClientProvider.reg
+! grep Old /usr/local/var/lib/sfcb/stage/regs/DHCPClientProvider.reg
 registered
 echo "== remove: what the administrator has made stays"
 install -e $(rpm -qa | grep -v ^machine)
@@ -286,7 +286,6 @@ dhcp-client-provider-schema-0.1.0-2
 machine-1-1
 LOG_LEVEL=4000
 #LOG_LEVEL=5000
-11
 ./mofs/root/cimv2/10-dhcp-client.mof
 ./mofs/root/cimv2/11-dhcp-extensions.mof
 ./mofs/root/cimv2/12-dhcp-profile.mof
