@@ -54,6 +54,17 @@ for type in sfcb pegasus; do
     check "$type: taking out again" env DESTDIR="$stage" "$program" -t "$type" -d
 done
 
+# As packages do when they are removed one by one.
+own=$(dirname "$program")/schema
+for type in sfcb pegasus; do
+    stage=$directory/$type
+    DESTDIR=$stage "$program" -t "$type" --exact
+    for library in DHCPClientNeighbours DHCPClientProvider; do
+        DESTDIR=$stage "$program" -t "$type" -d -r "$own/exact/$library.registration"
+    done
+    check "$type: the last form leaves nothing" test -z "$(find "$stage" -mindepth 1)"
+done
+
 # What the user names counts.
 stage=$directory/named
 mkdir "$stage"
@@ -148,7 +159,7 @@ check "leaves nothing" test -z "$(find "$directory/stage" -mindepth 1)"
 for option in -h --help; do
     told "prints its options with $option" "$option" <<'TEXT'
 Usage: provider-register.sh [-t TYPE] [--exact] [-n NAMESPACE] [-r FILE...] [-m FILE...]
-       [--sfcb-root DIR] [--interop NAMESPACE] [-d] [-v]
+       [--sfcb-root DIR] [--interop NAMESPACE] [-d | --refresh] [-v]
 
 Registers CMPI providers with an object manager, or takes them out again.
 
@@ -166,6 +177,8 @@ Registers CMPI providers with an object manager, or takes them out again.
   --interop NAMESPACE
                 the interop namespace of OpenPegasus; asked for when not given
   -d            take the providers out
+  --refresh     bring up to date what is registered for the same namespaces, and register
+                nothing else
   -v            say what is done
   -h            print this help
 
@@ -307,6 +320,36 @@ check "takes the provider out of the repository then" test ! -s "$state/var/lib/
 check "leaves nothing but SFCB's own directories" test "$(cd "$state/var/lib/sfcb/stage" && find . -mindepth 1 | sort | xargs)" == "./mofs ./regs"
 
 settle sfcbrepos
+ends 0 --refresh "${thing[@]}"
+check "refreshing registers nothing" test -z "$(find "$state/var/lib/sfcb/stage" -type f)"
+ends 0 "${thing[@]}"
+: >"$state/called"
+ends 0 --refresh "${thing[@]}"
+called "refreshing does nothing where nothing has changed" <<'TEXT'
+TEXT
+sed -i 's/provider: .*/provider: NewThings/' "$directory/one.registration"
+ends 0 --refresh "${thing[@]}"
+called "refreshing makes what has changed known" <<'TEXT'
+sfcbrepos -f
+TEXT
+check "the registration is the new one" grep -qx '   provider: NewThings' "$state/var/lib/sfcb/stage/regs/ThingsLibrary.reg"
+sed -i 's/provider: .*/provider: Things/' "$directory/one.registration"
+settle sfcbrepos
+ends 0 --exact
+sed -i 's/provider: .*/provider: Old/' "$state/var/lib/sfcb/stage/regs/DHCPClientProvider.reg"
+ends 0 --refresh
+check "refreshing leaves the form that is registered" test "$(cd "$state/var/lib/sfcb/stage/regs" && echo *)" == \
+    "DHCPClientNeighbours.reg DHCPClientProvider.reg"
+check "and makes it new" bash -c "! grep -q Old '$state/var/lib/sfcb/stage/regs/DHCPClientProvider.reg'"
+ends 0 --exact -n root/other
+: >"$state/called"
+ends 0 --refresh
+called "refreshing leaves the namespace that was chosen" <<'TEXT'
+TEXT
+ends 2 --refresh --exact
+ends 2 --refresh -d
+
+settle sfcbrepos
 mkdir "$directory/elsewhere" "$directory/elsewhere/stage"
 ends 0 --sfcb-root "$directory/elsewhere" "${thing[@]}"
 called "SFCB's directory can be named" <<'TEXT'
@@ -357,6 +400,14 @@ cimprovider -r -m ThingsLibraryModule
 cimmof -nroot/interop /var/lib/dhcp-client-provider/pegasus/ThingsLibrary.mof.new
 END
 check "keeps what was loaded" grep -q TEST_Thing "$kept/root/a/things.mof"
+
+ends 0 --interop root/interop --refresh "${thing[@]}"
+called "refreshing loads nothing where nothing has changed" <<'END'
+END
+mv "$kept/ThingsLibrary.mof" "$kept/kept"
+ends 0 --interop root/interop --refresh "${thing[@]}"
+check "refreshing registers nothing" test ! -e "$kept/ThingsLibrary.mof"
+mv "$kept/kept" "$kept/ThingsLibrary.mof"
 
 echo cimprovider >"$state/failing"
 ends 1 -d "${thing[@]}"
