@@ -39,9 +39,10 @@ struct ServedClass {
     std::span<const char* const> keys;
     Server server;
     std::span<const Property> properties;  ///< empty for those of other providers
-    /// Whether the exact provider gives just what a path names, or more, and not anything
-    /// else, when the path has some of the keys.
-    bool narrows = false;
+    /// The key by which the exact provider is asked for one object; null: for all of them. When a
+    /// path has this key, it gives just what the path names, or more, and not anything else. It
+    /// compares each further key with every object that it has.
+    const char* narrowsBy = nullptr;
     /// The property that a client can change; null: none.
     const char* writable = nullptr;
 };

@@ -5,6 +5,7 @@
 
 #include "providerutilities/ProviderUtilities.h"
 #include "providerutilities/Refusal.h"
+#include "zrcommon/Strings.h"
 
 namespace ZR::DHCPClientGateway {
 
@@ -51,8 +52,13 @@ void askEach(const Request& request, const ServedClass& served, Form form,
              const KeyTexts& narrowing, Collector::Take take) {
     const Collector collector(std::move(take));
     CMPIInstanceMI* provider = exactProvider;
-    const CMPIObjectPath* path =
-        makePath(request, served.name, served.narrows ? narrowing : KeyTexts{});
+    KeyTexts keys;
+    for (const auto& key : narrowing) {
+        if (served.narrowsBy != nullptr && equalNames(key.first, served.narrowsBy)) {
+            keys.push_back(key);
+        }
+    }
+    const CMPIObjectPath* path = makePath(request, served.name, keys);
     const CMPIStatus status =
         form == Form::names ? provider->ft->enumerateInstanceNames(provider, request.context,
                                                                    collector.record(), path)

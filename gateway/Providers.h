@@ -37,8 +37,8 @@ struct Object {
 enum class Form { names, instances };
 
 /// Hands on what the exact provider has of a class, in its order, one after the other; with
-/// keys just what they name, where it narrows by keys. Throws Refusal when it refuses, and
-/// what `take` throws.
+/// keys at least what they name, and less than all where it narrows by one of them. Throws Refusal
+/// when it refuses, and what `take` throws.
 void askEach(const Request& request, const ServedClass& served, Form form,
              const KeyTexts& narrowing, Collector::Take take);
 

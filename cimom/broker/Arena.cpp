@@ -3,6 +3,7 @@
 #include <sys/mman.h>
 
 #include <algorithm>
+#include <array>
 #include <cstdlib>
 #include <cstring>
 
@@ -11,11 +12,48 @@ namespace cimom::broker {
 namespace {
 
 constexpr std::size_t largestChunk = std::size_t{1024} * 1024;
+/// A request that needs more than some chunks up to this size gets the largest at once.
+constexpr std::size_t largestSmallChunk = std::size_t{64} * 1024;
 constexpr std::size_t cloneChunk = 512;
 constexpr std::size_t fileChunk = std::size_t{512} * 1024;
 /// What an arena has up to this size stays in memory: enough for a thousand instances,
 /// which would cost a fifth more in a file.
 constexpr std::size_t warm = std::size_t{4} * 1024 * 1024;
+
+/// Chunks of the largest size that ended arenas have left for the next ones: getting new pages
+/// from the system takes longer than filling them. So many at most stay with the process. Safe
+/// for concurrent use.
+class SpareChunks {
+  public:
+    /// Null when there is none.
+    void* take() noexcept {
+        const std::lock_guard lock(mutex_);
+        return count_ == 0 ? nullptr : chunks_[--count_];
+    }
+    /// False when there is no room for it.
+    bool keep(void* chunk) noexcept {
+        const std::lock_guard lock(mutex_);
+        if (count_ == most) {
+            return false;
+        }
+        chunks_[count_++] = chunk;
+        return true;
+    }
+
+  private:
+#ifdef ZR_SANITIZERS
+    // They are to see what a provider uses after its request.
+    static constexpr std::size_t most = 0;
+#else
+    static constexpr std::size_t most = 6;
+#endif
+    std::mutex mutex_;
+    std::array<void*, most + 1> chunks_{};
+    std::size_t count_ = 0;
+};
+
+/// Without a destructor that does anything: arenas may end after it.
+constinit SpareChunks spareChunks;
 
 }  // namespace
 
@@ -27,7 +65,7 @@ Arena::~Arena() {
         Chunk* const previous = chunks_->previous;
         if (chunks_->mapped > 0) {
             ::munmap(chunks_, chunks_->mapped);
-        } else {
+        } else if (chunks_->size != largestChunk || !spareChunks.keep(chunks_)) {
             std::free(chunks_);
         }
         chunks_ = previous;
@@ -63,15 +101,21 @@ void* Arena::grow(std::size_t bytes) {
         memory = growInFile(size);
         mapped = memory == nullptr ? 0 : size;
     }
+    if (memory == nullptr && size == largestChunk) {
+        memory = spareChunks.take();
+    }
     if (memory == nullptr) {
         memory = std::malloc(size);
     }
     if (memory == nullptr) {
         throw std::bad_alloc();
     }
-    chunks_ = ::new (memory) Chunk{chunks_, mapped};
+    chunks_ = ::new (memory) Chunk{chunks_, mapped, size};
     reserved_ += size;
-    nextChunk_ = std::min(std::max(nextChunk_, size) * 2, largestChunk);
+    nextChunk_ = std::max(nextChunk_, size) * 2;
+    if (nextChunk_ > largestSmallChunk) {
+        nextChunk_ = largestChunk;
+    }
     std::byte* const first = static_cast<std::byte*>(memory) + header;
     next_ = first + bytes;
     end_ = static_cast<std::byte*>(memory) + size;

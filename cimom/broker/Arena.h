@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
 #include <memory>
 #include <mutex>
 #include <new>
@@ -11,6 +12,8 @@
 #include "cimom/TemporaryFile.h"
 
 namespace cimom::broker {
+
+struct StringRecord;
 
 /// Memory that only grows and is given back as a whole. Objects in it are never
 /// destroyed one by one, so only trivially destructible types may live there.
@@ -63,6 +66,18 @@ class Arena {
         return first;
     }
 
+    /// Where the string of a name with this hash is kept for the next object that has the name:
+    /// null at first. Null when this arena keeps none, as those of clones do.
+    StringRecord** name(std::uint64_t hash) {
+        if (locked_) {
+            return nullptr;
+        }
+        if (names_ == nullptr) {
+            names_ = makeMany<StringRecord*>(nameSlots);
+        }
+        return &names_[hash % nameSlots];
+    }
+
     /// A copy of the text with a zero byte behind it.
     char* copyText(std::string_view text);
 
@@ -79,9 +94,11 @@ class Arena {
 
   private:
     static constexpr std::size_t alignment = alignof(std::max_align_t);
+    static constexpr std::size_t nameSlots = 128;
     struct Chunk {
         Chunk* previous;
         std::size_t mapped;  ///< bytes of the file; 0: memory of its own
+        std::size_t size;
     };
 
     void* bump(std::size_t bytes) {
@@ -100,6 +117,7 @@ class Arena {
     std::byte* next_ = nullptr;
     std::byte* end_ = nullptr;
     Chunk* chunks_ = nullptr;
+    StringRecord** names_ = nullptr;
     std::size_t nextChunk_ = std::size_t{16} * 1024;
     std::size_t reserved_ = 0;
     const void* root_ = nullptr;

@@ -13,45 +13,62 @@ namespace cimom::broker {
 
 namespace {
 
-Scalar scalarOf(const CMPIData& data) {
+/// Makes the data the value of a scalar that has none.
+void fillScalar(Scalar& scalar, const CMPIData& data) {
     if ((data.state & CMPI_nullValue) != 0) {
-        return {};
+        return;
     }
     switch (data.type) {
         case CMPI_boolean:
-            return data.value.boolean != 0;
+            scalar = data.value.boolean != 0;
+            break;
         case CMPI_char16:
-            return static_cast<char16_t>(data.value.char16);
+            scalar = static_cast<char16_t>(data.value.char16);
+            break;
         case CMPI_uint8:
-            return std::uint64_t{data.value.uint8};
+            scalar = std::uint64_t{data.value.uint8};
+            break;
         case CMPI_uint16:
-            return std::uint64_t{data.value.uint16};
+            scalar = std::uint64_t{data.value.uint16};
+            break;
         case CMPI_uint32:
-            return std::uint64_t{data.value.uint32};
+            scalar = std::uint64_t{data.value.uint32};
+            break;
         case CMPI_uint64:
-            return static_cast<std::uint64_t>(data.value.uint64);
+            scalar = static_cast<std::uint64_t>(data.value.uint64);
+            break;
         case CMPI_sint8:
-            return std::int64_t{data.value.sint8};
+            scalar = std::int64_t{data.value.sint8};
+            break;
         case CMPI_sint16:
-            return std::int64_t{data.value.sint16};
+            scalar = std::int64_t{data.value.sint16};
+            break;
         case CMPI_sint32:
-            return std::int64_t{data.value.sint32};
+            scalar = std::int64_t{data.value.sint32};
+            break;
         case CMPI_sint64:
-            return static_cast<std::int64_t>(data.value.sint64);
+            scalar = static_cast<std::int64_t>(data.value.sint64);
+            break;
         case CMPI_real32:
-            return static_cast<double>(data.value.real32);
+            scalar = static_cast<double>(data.value.real32);
+            break;
         case CMPI_real64:
-            return data.value.real64;
+            scalar = data.value.real64;
+            break;
         case CMPI_string:
-            return std::string(textOf(data.value.string));
+            scalar.emplace<std::string>(textOf(data.value.string));
+            break;
         case CMPI_dateTime:
-            return std::string(dateTimeOf(data.value.dateTime)->text->view());
+            scalar.emplace<std::string>(dateTimeOf(data.value.dateTime)->text->view());
+            break;
         case CMPI_ref:
-            return std::make_shared<const ObjectPath>(toModel(*pathOf(data.value.ref)));
+            scalar = std::make_shared<const ObjectPath>(toModel(*pathOf(data.value.ref)));
+            break;
         case CMPI_instance:
-            return std::make_shared<const Instance>(toModel(*instanceOf(data.value.inst)));
+            scalar = std::make_shared<const Instance>(toModel(*instanceOf(data.value.inst)));
+            break;
         default:
-            return {};
+            break;
     }
 }
 
@@ -189,11 +206,30 @@ CMPIData namedData(Arena& arena, const ClassRepository* classes, const NamedValu
     }
 }
 
+/// Makes the data a value that has none.
+void fillValue(Value& value, const CMPIData& data) {
+    value.isArray = isArrayType(data.type);
+    // A null without a type, set on a property that no class declares.
+    value.type = cimType(withoutArray(data.type)).value_or(Type::string);
+    if ((data.state & CMPI_nullValue) != 0) {
+        return;
+    }
+    if (!value.isArray) {
+        fillScalar(value.content.emplace<Scalar>(), data);
+        return;
+    }
+    const ArrayRecord& array = *arrayOf(data.value.array);
+    Array& elements = value.content.emplace<Array>(array.size);
+    for (CMPICount index = 0; index < array.size; ++index) {
+        fillScalar(elements[index], array.elements[index]);
+    }
+}
+
 std::vector<NamedValue> toModel(const EntryList& entries) {
-    std::vector<NamedValue> values;
-    values.reserve(entries.size());
-    for (const Entry& entry : entries) {
-        values.push_back({std::string(entry.name->view()), broker::toModel(entry.data)});
+    std::vector<NamedValue> values(entries.size());
+    for (CMPICount index = 0; index < entries.size(); ++index) {
+        values[index].name = entries[index].name->view();
+        fillValue(values[index].value, entries[index].data);
     }
     return values;
 }
@@ -201,22 +237,9 @@ std::vector<NamedValue> toModel(const EntryList& entries) {
 }  // namespace
 
 Value toModel(const CMPIData& data) {
-    const bool isArray = isArrayType(data.type);
-    // A null without a type, set on a property that no class declares.
-    const Type type = cimType(withoutArray(data.type)).value_or(Type::string);
-    if ((data.state & CMPI_nullValue) != 0) {
-        return Value::null(type, isArray);
-    }
-    if (!isArray) {
-        return Value{type, false, scalarOf(data)};
-    }
-    const ArrayRecord* const array = arrayOf(data.value.array);
-    Array elements;
-    elements.reserve(array->size);
-    for (CMPICount index = 0; index < array->size; ++index) {
-        elements.push_back(scalarOf(array->elements[index]));
-    }
-    return Value{type, true, std::move(elements)};
+    Value value;
+    fillValue(value, data);
+    return value;
 }
 
 ObjectPath toModel(const PathRecord& path) {

@@ -1,12 +1,6 @@
 #include "include/Trace.h"
 
-#include <algorithm>
-#include <array>
-#include <charconv>
-#include <concepts>
-#include <cstring>
 #include <string_view>
-#include <utility>
 
 #include "include/TracePoint.h"
 
@@ -14,96 +8,9 @@ namespace ZR {
 
 namespace {
 
-/// A line format, taken apart at its conversions when the program is compiled: a
-/// literal stands before each argument, and the last one behind them all.
-struct Format {
-    std::array<std::string_view, 5> literals;
-    std::size_t arguments = 0;
-    std::size_t literalSize = 0;
+using TraceText::Buffer;
 
-    consteval explicit Format(std::string_view text) {
-        for (std::size_t at = text.find('%'); at != std::string_view::npos; at = text.find('%')) {
-            literals[arguments++] = text.substr(0, at);
-            literalSize += at;
-            text.remove_prefix(at + 2);
-        }
-        literals[arguments] = text;
-        literalSize += text.size();
-    }
-};
-
-constexpr Format enteringPlain("ENTERING: %s() in %s [Line: %d]");
-constexpr Format exitingPlain("EXITING: %s() in %s [Line: %d]");
-constexpr Format methodPlain("METHOD: %s() was invoked in %s [Line: %d]");
-constexpr Format messagePlain("MESSAGE [File: %s, Line: %d]: %s");
-
-constexpr Format enteringParameters("ENTERING: %s() in %s [Line: %d],Parameters List: %s");
-constexpr Format exitingParameters("EXITING: %s() in %s [Line: %d],Parameters List: %s");
-constexpr Format methodParameters("METHOD: %s() was invoked in %s [Line: %d],Parameters List: %s");
-constexpr Format messageParameters("MESSAGE [File: %s, Line: %d]: %s,Parameters List: %s");
-
-constexpr Format textVariable("VARIABLE: '%s' has Value '%s' at line %d in %s");
-constexpr Format numberVariable("VARIABLE: '%s' has Value '%d' at line %d in %s");
-
-/// The argument of one conversion: %s takes a text, %d a number.
-struct Argument {
-    // The digits are written as needed.
-    // NOLINTBEGIN(cppcoreguidelines-pro-type-member-init)
-    explicit Argument(std::string_view argument) : text(argument) {}
-    explicit Argument(unsigned argument) {
-        const auto* end =
-            std::to_chars(digits.data(), digits.data() + digits.size(), static_cast<int>(argument))
-                .ptr;
-        text = std::string_view(digits.data(), end);
-    }
-    // NOLINTEND(cppcoreguidelines-pro-type-member-init)
-    Argument(const Argument&) = delete;
-    Argument& operator=(const Argument&) = delete;
-
-    std::array<char, 12> digits;
-    std::string_view text;
-};
-
-/// Copies at least `block` bytes as a run of blocks and a last block that overlaps the run.
-template <std::size_t block>
-inline void copyBlocks(char* out, const char* in, std::size_t size) {
-    for (std::size_t done = 0; done + block < size; done += block) {
-        std::memcpy(out + done, in + done, block);
-    }
-    std::memcpy(out + size - block, in + size - block, block);
-}
-
-/// Copies a few bytes without a call: pieces of trace lines are short, and calling
-/// memcpy for each costs more than the copying.
-inline void copyShort(char* out, const char* in, std::size_t size) {
-    if (size >= 16) {
-        copyBlocks<16>(out, in, size);
-    } else if (size >= 8) {
-        copyBlocks<8>(out, in, size);
-    } else if (size >= 4) {
-        copyBlocks<4>(out, in, size);
-    } else {
-        for (std::size_t done = 0; done < size; ++done) {
-            out[done] = in[done];
-        }
-    }
-}
-
-/// A buffer of one helper. Behind the text that was formatted last it is all zero,
-/// so that zeroing it for a new text means zeroing what of the old one is longer.
-struct Buffer {
-    std::array<char, traceBufferSize> text;
-    std::size_t used;
-
-    /// Makes the first `size` bytes the whole content.
-    std::string_view keep(std::size_t size) {
-        if (size < used) {
-            std::memset(text.data() + size, 0, used - size);
-        }
-        used = size;
-        return {text.data(), used};
-    }
-};
+constexpr std::string_view beforeParameters = ",Parameters List: ";
 
 /// Those of one thread.
 struct Buffers {
@@ -126,53 +33,14 @@ buffersOfThread() {
     return buffers;
 }
 
-/// Formats a text that fits. Literals have sizes known to the compiler here, which
-/// turns the copying of each into a few moves.
-template <const Format& format, std::size_t... index, typename... Arguments>
-void formatWhole(char* out, std::index_sequence<index...> /*all*/, const Arguments&... arguments) {
-    const auto putLiteral = [&out]<std::size_t at>() {
-        constexpr std::string_view literal = format.literals[at];
-        std::memcpy(out, literal.data(), literal.size());
-        out += literal.size();
-    };
-    const auto putArgument = [&out](const Argument& argument) {
-        copyShort(out, argument.text.data(), argument.text.size());
-        out += argument.text.size();
-    };
-    ((putLiteral.template operator()<index>(), putArgument(arguments)), ...);
-    putLiteral.template operator()<sizeof...(index)>();
-}
-
-/// Formats what of the text fits into the buffer; returns the size.
-template <std::size_t count>
-std::size_t formatCut(Buffer& buffer, const Format& format,
-                      const std::array<std::string_view, count>& arguments) {
-    std::size_t size = 0;
-    const auto put = [&size, &buffer](std::string_view piece) {
-        size += piece.copy(buffer.text.data() + size, buffer.text.size() - 1 - size);
-    };
-    for (std::size_t i = 0; i < count; ++i) {
-        put(format.literals[i]);
-        put(arguments[i]);
+/// The literal before the rest of an entering or exiting line.
+Buffer& begun(Buffer& buffer, MessageType type, std::string_view rest) {
+    if (type == entering) {
+        buffer.set("ENTERING: ", rest);
+    } else {
+        buffer.set("EXITING: ", rest);
     }
-    put(format.literals[count]);
-    return size;
-}
-
-/// Formats into the buffer, up to its last byte, which stays zero.
-template <const Format& format, std::same_as<Argument>... Arguments>
-std::string_view formatAll(Buffer& buffer, const Arguments&... arguments) {
-    static_assert(sizeof...(arguments) == format.arguments);
-    const std::size_t size = format.literalSize + (arguments.text.size() + ...);
-    if (size >= buffer.text.size()) {
-        return buffer.keep(formatCut<sizeof...(arguments)>(buffer, format, {arguments.text...}));
-    }
-    formatWhole<format>(buffer.text.data(), std::index_sequence_for<Arguments...>(), arguments...);
-    return buffer.keep(size);
-}
-
-std::string_view formatNothing(Buffer& buffer) {
-    return buffer.keep(0);
+    return buffer;
 }
 
 constexpr std::string_view separator =
@@ -181,61 +49,63 @@ static_assert(separator.size() == 78);
 
 constexpr const char* markFile = "include/Trace";
 
+void writeSeparator(const TracePoint& at) {
+    TKLog::TKMessageBuffer line;
+    line << separator;
+    writeLog(at, flowLevel, line.str());
+    writeTrace(at, flowLevel, separator);
+}
+
 }  // namespace
 
 namespace TraceText {
 
-std::string_view variable(std::string_view name, std::string_view file, unsigned line,
-                          std::string_view value) {
-    return formatAll<textVariable>(buffersOfThread().textVariable, Argument(name), Argument(value),
-                                   Argument(line), Argument(file));
+void describe(TKLog::TKMessageBuffer& rest, std::string_view file, std::string_view function,
+              const LineNumber& line) {
+    rest << function << std::string_view("() in ") << file << std::string_view(" [Line: ")
+         << line.digits() << std::string_view("]");
 }
 
-std::string_view variable(std::string_view name, std::string_view file, unsigned line,
-                          unsigned value) {
-    return formatAll<numberVariable>(buffersOfThread().numberVariable, Argument(name),
-                                     Argument(value), Argument(line), Argument(file));
+void describeWithParameters(TKLog::TKMessageBuffer& rest, std::string_view file,
+                            std::string_view function, const LineNumber& line) {
+    describe(rest, file, function, line);
+    rest << beforeParameters;
 }
 
-std::string_view plain(std::string_view file, std::string_view function, unsigned line,
-                       MessageType type) {
+Buffer& plain(MessageType type, std::string_view rest) {
+    return begun(buffersOfThread().plain, type, rest);
+}
+
+Buffer& withParameters(MessageType type, std::string_view rest) {
+    return begun(buffersOfThread().withParameters, type, rest);
+}
+
+Buffer& invoked(std::string_view file, std::string_view function, const LineNumber& line) {
     Buffer& buffer = buffersOfThread().plain;
-    const Argument where(file);
-    const Argument what(function);
-    const Argument at(line);
-    switch (type) {
-        case entering:
-            return formatAll<enteringPlain>(buffer, what, where, at);
-        case exiting:
-            return formatAll<exitingPlain>(buffer, what, where, at);
-        case method:
-            return formatAll<methodPlain>(buffer, what, where, at);
-        case message:
-            return formatAll<messagePlain>(buffer, where, at, what);
-        default:
-            return formatNothing(buffer);
-    }
+    buffer.set("METHOD: ", function, "() was invoked in ", file, " [Line: ", line.digits(), "]");
+    return buffer;
 }
 
-std::string_view withParameters(std::string_view file, std::string_view function, unsigned line,
-                                std::string_view parameters, MessageType type) {
-    Buffer& buffer = buffersOfThread().withParameters;
-    const Argument where(file);
-    const Argument what(function);
-    const Argument at(line);
-    const Argument with(parameters);
-    switch (type) {
-        case entering:
-            return formatAll<enteringParameters>(buffer, what, where, at, with);
-        case exiting:
-            return formatAll<exitingParameters>(buffer, what, where, at, with);
-        case method:
-            return formatAll<methodParameters>(buffer, what, where, at, with);
-        case message:
-            return formatAll<messageParameters>(buffer, where, at, what, with);
-        default:
-            return formatNothing(buffer);
-    }
+Buffer& failure(std::string_view file, const LineNumber& line, std::string_view text) {
+    Buffer& buffer = buffersOfThread().plain;
+    buffer.set("MESSAGE [File: ", file, ", Line: ", line.digits(), "]: ", text);
+    return buffer;
+}
+
+Buffer& variable(std::string_view name, std::string_view file, const LineNumber& line,
+                 std::string_view value) {
+    Buffer& buffer = buffersOfThread().textVariable;
+    buffer.set("VARIABLE: '", name, "' has Value '", value, "' at line ", line.digits(), " in ",
+               file);
+    return buffer;
+}
+
+Buffer& variable(std::string_view name, std::string_view file, const LineNumber& line,
+                 unsigned value) {
+    Buffer& buffer = buffersOfThread().numberVariable;
+    buffer.set("VARIABLE: '", name, "' has Value '", LineNumber(value).digits(), "' at line ",
+               line.digits(), " in ", file);
+    return buffer;
 }
 
 }  // namespace TraceText
@@ -244,36 +114,86 @@ std::string_view withParameters(std::string_view file, std::string_view function
 const char* trace(const char* variable, const char* file, unsigned line, const char* value) {
     return TraceText::variable(TraceText::of(variable), TraceText::of(file), line,
                                TraceText::of(value))
+        .text()
         .data();
 }
 
 const char* trace(const char* variable, const char* file, unsigned line, unsigned value) {
-    return TraceText::variable(TraceText::of(variable), TraceText::of(file), line, value).data();
+    return TraceText::variable(TraceText::of(variable), TraceText::of(file), line, value)
+        .text()
+        .data();
 }
 
 const char* trace(const char* file, const char* function, unsigned line, MessageType type) {
-    return TraceText::plain(TraceText::of(file), TraceText::of(function), line, type).data();
+    const std::string_view where = TraceText::of(file);
+    const std::string_view what = TraceText::of(function);
+    Buffer& buffer = buffersOfThread().plain;
+    TKLog::TKMessageBuffer rest;
+    switch (type) {
+        case entering:
+        case exiting:
+            TraceText::describe(rest, where, what, line);
+            begun(buffer, type, rest.str());
+            break;
+        case method:
+            TraceText::invoked(where, what, line);
+            break;
+        case message:
+            TraceText::failure(where, line, what);
+            break;
+        default:
+            buffer.set();
+            break;
+    }
+    return buffer.text().data();
 }
 
 const char* tracepara(const char* file, const char* function, unsigned line, const char* parameters,
                       MessageType type) {
-    return TraceText::withParameters(TraceText::of(file), TraceText::of(function), line,
-                                     TraceText::of(parameters), type)
-        .data();
+    const std::string_view where = TraceText::of(file);
+    const std::string_view what = TraceText::of(function);
+    const std::string_view with = TraceText::of(parameters);
+    const LineNumber at = line;
+    Buffer& buffer = buffersOfThread().withParameters;
+    TKLog::TKMessageBuffer rest;
+    switch (type) {
+        case entering:
+        case exiting:
+            TraceText::describeWithParameters(rest, where, what, at);
+            rest << with;
+            begun(buffer, type, rest.str());
+            break;
+        case method:
+            buffer.set("METHOD: ", what, "() was invoked in ", where, " [Line: ", at.digits(), "]",
+                       beforeParameters, with);
+            break;
+        case message:
+            buffer.set("MESSAGE [File: ", where, ", Line: ", at.digits(), "]: ", what,
+                       beforeParameters, with);
+            break;
+        default:
+            buffer.set();
+            break;
+    }
+    return buffer.text().data();
 }
 
 void markProviderEntry(const std::string& logger, const char* file, const char* function,
                        unsigned line) {
     const TraceSource source{markFile, logger};
-    writeLine(ZR_HERE, flowLevel, [] { return separator; });
-    writeLine(ZR_HERE, flowLevel, [&] { return TraceText::plain(file, function, line, entering); });
+    writeSeparator(ZR_HERE);
+    TKLog::TKMessageBuffer rest;
+    TraceText::describe(rest, file, function, line);
+    writeLine(ZR_HERE, flowLevel, TraceText::plain(entering, rest.str()));
 }
 
 void markProviderExit(const std::string& logger, const char* file, const char* function,
                       unsigned line) {
     const TraceSource source{markFile, logger};
-    writeLine(ZR_HERE, flowLevel, [&] { return TraceText::plain(file, function, line, exiting); });
-    writeLine(ZR_HERE, flowLevel, [] { return separator; });
+    TKLog::TKMessageBuffer rest;
+    TraceText::describe(rest, file, function, line);
+    writeLine(ZR_HERE, flowLevel, TraceText::plain(exiting, rest.str()));
+    writeSeparator(ZR_HERE);
 }
 
 }  // namespace ZR

@@ -3,44 +3,34 @@
 namespace ZR {
 
 void traceVariable(const TracePoint& at, std::string_view name, std::string_view value) {
-    writeLine(at, flowLevel,
-              [&] { return TraceText::variable(name, at.source.file, at.line, value); });
+    writeLine(at, flowLevel, TraceText::variable(name, at.source.file, at.line, value));
 }
 
 void traceVariable(const TracePoint& at, std::string_view name, unsigned value) {
-    writeLine(at, flowLevel,
-              [&] { return TraceText::variable(name, at.source.file, at.line, value); });
+    writeLine(at, flowLevel, TraceText::variable(name, at.source.file, at.line, value));
 }
 
 void traceMethod(const TracePoint& at) {
-    writeLine(at, flowLevel,
-              [&] { return TraceText::plain(at.source.file, at.function, at.line, method); });
+    writeLine(at, flowLevel, TraceText::invoked(at.source.file, at.function, at.line));
 }
 
 void traceMessage(const TracePoint& at, const char* text) {
-    writeLine(at, failureLevel,
-              [&] { return TraceText::plain(at.source.file, text, at.line, message); });
+    writeLine(at, failureLevel, TraceText::failure(at.source.file, at.line, TraceText::of(text)));
 }
 
 TraceScope::TraceScope(const TracePoint& at) : at_(at) {
-    writeLine(at_, flowLevel, [this] {
-        return TraceText::plain(at_.source.file, at_.function, at_.line, entering);
-    });
+    TraceText::describe(rest_, at.source.file, at.function, at.line);
+    writeLine(at_, flowLevel, TraceText::plain(entering, rest_.str()));
 }
 
 TraceScope::~TraceScope() {
     if (std::uncaught_exceptions() == exceptions_) {
-        writeLine(at_, flowLevel, [this] {
-            return TraceText::plain(at_.source.file, at_.function, at_.line, exiting);
-        });
+        writeLine(at_, flowLevel, TraceText::plain(exiting, rest_.str()));
     }
 }
 
 void ParameterScope::trace(MessageType type) const {
-    writeLine(at_, parameterLevel, [&] {
-        return TraceText::withParameters(at_.source.file, at_.function, at_.line, parameters_.str(),
-                                         type);
-    });
+    writeLine(at_, parameterLevel, TraceText::withParameters(type, rest_.str()));
 }
 
 ParameterScope::~ParameterScope() {

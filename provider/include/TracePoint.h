@@ -28,11 +28,17 @@ struct TraceSource {
 struct TracePoint {
     const TraceSource& source;
     std::string_view function;  ///< a literal
-    unsigned line;
+    LineNumber line;
 };
 
+/// A line's number, made when the program is compiled.
+consteval LineNumber constantLine(unsigned line) {
+    return LineNumber(line);
+}
+
 /// This function and line of the file whose TraceSource is called `source`.
-#define ZR_HERE (::ZR::TracePoint{source, {__func__, sizeof(__func__) - 1}, __LINE__})
+#define ZR_HERE \
+    (::ZR::TracePoint{source, {__func__, sizeof(__func__) - 1}, ::ZR::constantLine(__LINE__)})
 
 /// The trace points of one of several classes whose functions are written once for
 /// all. They tell the class's own source file, and of it the line where its row
@@ -40,7 +46,7 @@ struct TracePoint {
 struct RowSource {
     TraceSource source;
     std::string_view destructorName;  ///< "~" and the name of the class, a literal
-    unsigned line;
+    LineNumber line;
 
     [[nodiscard]] TracePoint at(std::string_view function) const {
         return {source, function, line};
@@ -54,18 +60,25 @@ struct RowSource {
     [[nodiscard]] TracePoint destructor() const { return at(destructorName); }
 };
 
-/// Hands a line to both channels of the logging service, log and trace. The text is formatted anew
-/// for the second, since the first may have traced on its own.
-template <typename Text>
-void writeLine(const TracePoint& at, int level, const Text& text) {
-    {
-        TKLog::TKMessageBuffer line;
-        line << text();
-        TKLog::TKLogger::logLevelMessage(at.source.file.data(), at.function.data(), at.line,
-                                         at.source.logger, level, nullptr, 0, 0, line.str());
-    }
-    TKLog::TKLogger::traceLevelMessage(at.source.file.data(), at.function.data(), at.line,
-                                       at.source.logger, level, nullptr, 0, 0, text());
+/// Hands a message to the log channel, or to the trace channel.
+inline void writeLog(const TracePoint& at, int level, std::string_view message) {
+    TKLog::TKLogger::logLevelMessage(at.source.file.data(), at.function.data(), at.line.number(),
+                                     at.source.logger, level, nullptr, 0, 0, message);
+}
+inline void writeTrace(const TracePoint& at, int level, std::string_view message) {
+    TKLog::TKLogger::traceLevelMessage(at.source.file.data(), at.function.data(), at.line.number(),
+                                       at.source.logger, level, nullptr, 0, 0, message);
+}
+
+/// Hands a line to both channels of the logging service. The text is put into its buffer anew for
+/// the second, since the first may have traced on its own: the bytes are the same, and copying
+/// them costs a fraction of formatting them.
+inline void writeLine(const TracePoint& at, int level, TraceText::Buffer& text) {
+    TKLog::TKMessageBuffer line;
+    line << text.text();
+    writeLog(at, level, line.str());
+    text.set(line.str());
+    writeTrace(at, level, text.text());
 }
 
 /// VARIABLE lines.
@@ -92,6 +105,7 @@ class TraceScope {
   private:
     TracePoint at_;
     int exceptions_ = std::uncaught_exceptions();
+    TKLog::TKMessageBuffer rest_;  ///< of both lines
 };
 
 /// The same for a function with parameters: pairs of " name=" and a value, the
@@ -100,7 +114,8 @@ class ParameterScope {
   public:
     template <typename... Pieces>
     explicit ParameterScope(const TracePoint& at, const Pieces&... pieces) : at_(at) {
-        (parameters_ << ... << pieces);
+        TraceText::describeWithParameters(rest_, at.source.file, at.function, at.line);
+        (rest_ << ... << pieces);
         trace(entering);
     }
     ParameterScope(const ParameterScope&) = delete;
@@ -112,7 +127,7 @@ class ParameterScope {
 
     TracePoint at_;
     int exceptions_ = std::uncaught_exceptions();
-    TKLog::TKMessageBuffer parameters_;
+    TKLog::TKMessageBuffer rest_;  ///< of both lines
 };
 
 }  // namespace ZR

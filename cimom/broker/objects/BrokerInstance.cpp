@@ -134,7 +134,7 @@ CMPIrc set(InstanceRecord* instance, const char* name, const CMPIValue* value, C
         return CMPI_RC_ERR_TYPE_MISMATCH;
     }
     const bool isPathKey = declared != nullptr && isKey(*instance->declaration, *declared);
-    const bool kept = isKept(instance->filter, name);
+    const bool kept = isKept(instance->filter, key.text());
     if (!kept && !isPathKey) {
         return CMPI_RC_OK;
     }
@@ -273,7 +273,7 @@ InstanceRecord* instanceOf(const CMPIInstance* instance) noexcept {
 InstanceRecord* makeInstance(Arena& arena, const PathRecord& path) {
     InstanceRecord* const instance = make(arena, path);
     // Most instances of providers have this many; saves growing step by step.
-    instance->properties.reserve(arena, 16);
+    instance->properties.reserve(arena, 24);
     return instance;
 }
 

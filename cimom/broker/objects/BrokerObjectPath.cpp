@@ -201,8 +201,8 @@ PathRecord* makePath(Arena& arena, const ClassRepository* classes, std::string_v
                        &arena,
                        classes,
                        emptyString(),
-                       nameSpace.empty() ? emptyString() : makeString(arena, nameSpace),
-                       className.empty() ? emptyString() : makeString(arena, className),
+                       nameSpace.empty() ? emptyString() : nameIn(arena, NameKey(nameSpace)),
+                       className.empty() ? emptyString() : nameIn(arena, NameKey(className)),
                        EntryList{},
                        0};
     return path;

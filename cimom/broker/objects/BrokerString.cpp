@@ -75,6 +75,18 @@ StringRecord* stringIn(Arena& arena, const CMPIString& string) {
     return makeString(arena, textOf(&string));
 }
 
+StringRecord* nameIn(Arena& arena, const NameKey& name) {
+    StringRecord** const kept = arena.name(name.hash());
+    if (kept == nullptr) {
+        return makeString(arena, name.text());
+    }
+    // The hash is that of several cases, and slots are shared.
+    if (*kept == nullptr || (*kept)->view() != name.text()) {
+        *kept = makeString(arena, name.text());
+    }
+    return *kept;
+}
+
 StringRecord* emptyString() noexcept {
     static char nothing[1] = {'\0'};
     static StringRecord record{{static_cast<void*>(nothing), &stringTable}, nullptr, 0};

@@ -6,6 +6,7 @@
 #include <string_view>
 
 #include "broker/Arena.h"
+#include "model/NameKey.h"
 
 namespace cimom::broker {
 
@@ -26,6 +27,9 @@ StringRecord* makeString(Arena& arena, std::string_view text);
 
 /// The string itself when it lives in that arena, else a copy there.
 StringRecord* stringIn(Arena& arena, const CMPIString& string);
+
+/// A string with the text of a name. Objects of an arena that have names in common share it.
+StringRecord* nameIn(Arena& arena, const NameKey& name);
 
 /// The record of an empty text that lives for ever.
 [[nodiscard]] StringRecord* emptyString() noexcept;

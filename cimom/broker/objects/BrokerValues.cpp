@@ -160,7 +160,7 @@ void EntryList::set(Arena& arena, const NameKey& name, const CMPIData& data) {
         entry->data = data;
         return;
     }
-    append(arena, {makeString(arena, name.text()), name.hash(), data});
+    append(arena, {nameIn(arena, name), name.hash(), data});
 }
 
 void EntryList::remove(CMPICount index) noexcept {

@@ -1,16 +1,21 @@
 // Where the objects of a request are, and until when.
 #include <gtest/gtest.h>
+#include <malloc.h>
+#include <sys/resource.h>
 #include <unistd.h>
 
 #include <algorithm>
 #include <cstdint>
 #include <cstring>
 #include <fstream>
+#include <string>
+#include <string_view>
 #include <thread>
 #include <vector>
 
 #include "broker/Arena.h"
 #include "broker/RequestScope.h"
+#include "broker/objects/BrokerString.h"
 #include "kit/Sanitizers.h"
 
 using cimom::broker::Arena;
@@ -95,6 +100,83 @@ TEST(Arena, KeepsAllAndLittleOfItInMemory) {
         ASSERT_EQ(all[index][0], index % 251);
         ASSERT_EQ(all[index][size - 1], index % 251);
     }
+}
+
+namespace {
+
+/// As the server sets it: blocks of this size or more go back to the system at once.
+constexpr int longBlock = 131072;
+constexpr std::size_t mebibyte = std::size_t{1024} * 1024;
+
+void fill(Arena& arena, std::size_t size) {
+    constexpr std::size_t block = 1024;
+    for (std::size_t done = 0; done < size; done += block) {
+        std::memset(arena.allocate(block), 1, block);
+    }
+}
+
+/// How often this thread has met a page that it did not have.
+long pageFaults() {
+    rusage usage{};
+    ::getrusage(RUSAGE_THREAD, &usage);
+    return usage.ru_minflt;
+}
+
+/// Bytes in blocks that the allocator would give back at once.
+std::size_t inLongBlocks() {
+    return ::mallinfo2().hblkhd;
+}
+
+}  // namespace
+
+TEST(Arena, MemoryOfAnEndedOneIsUsedAgain) {
+    if (ZR::Testing::sanitized) {
+        GTEST_SKIP() << "they are to see what is used after its request";
+    }
+    ASSERT_EQ(::mallopt(M_MMAP_THRESHOLD, longBlock), 1);
+    const auto request = [] {
+        Arena arena;
+        fill(arena, 3 * mebibyte);
+    };
+    request();
+    const long before = pageFaults();
+    request();
+    const auto page = static_cast<std::size_t>(::sysconf(_SC_PAGESIZE));
+    EXPECT_LT(static_cast<std::size_t>(pageFaults() - before), 3 * mebibyte / page / 10);
+}
+
+TEST(Arena, LittleOfTheMemoryOfEndedOnesIsKept) {
+    if (ZR::Testing::sanitized) {
+        GTEST_SKIP() << "their allocators do not tell";
+    }
+    ASSERT_EQ(::mallopt(M_MMAP_THRESHOLD, longBlock), 1);
+    const std::size_t before = inLongBlocks();
+    {
+        std::vector<Arena> arenas(5);
+        for (Arena& arena : arenas) {
+            fill(arena, 3 * mebibyte);
+        }
+        EXPECT_GT(inLongBlocks() + 6 * mebibyte, before + 15 * mebibyte);
+    }
+    EXPECT_LT(inLongBlocks(), before + 6 * mebibyte + mebibyte / 2);
+}
+
+TEST(Arena, ObjectsShareTheNamesThatTheyHaveInCommon) {
+    Arena arena;
+    const auto nameIn = [&arena](std::string_view text) {
+        return cimom::broker::nameIn(arena, cimom::NameKey(text));
+    };
+    const auto* const name = nameIn("ElementName");
+    EXPECT_EQ(nameIn("ElementName"), name);
+    // A client sees a name as it was written.
+    EXPECT_EQ(nameIn("elementname")->view(), "elementname");
+    EXPECT_EQ(name->view(), "ElementName");
+    // More than there is room for.
+    for (int count = 0; count < 1000; ++count) {
+        const std::string text = "Name" + std::to_string(count);
+        ASSERT_EQ(nameIn(text)->view(), text);
+    }
+    EXPECT_EQ(nameIn("ElementName")->view(), "ElementName");
 }
 
 TEST(Arena, HasAnEnd) {

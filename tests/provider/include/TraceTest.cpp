@@ -3,11 +3,15 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <cstdarg>
+#include <cstdio>
+#include <random>
 #include <string>
 #include <string_view>
 #include <thread>
 #include <vector>
 
+#include "include/TracePoint.h"
 #include "kit/LogCapture.h"
 
 namespace ZR {
@@ -128,6 +132,94 @@ TEST(Trace, BufferIsZeroBehindTheText) {
     EXPECT_EQ(bufferOf(trace("f", "g", 1, unknownType)), padded(""));
     tracepara("f", "g", 1, filler.c_str(), message);
     EXPECT_EQ(bufferOf(tracepara("f", "g", 1, "", unknownType)), padded(""));
+}
+
+/// A whole buffer as the C library fills it.
+[[gnu::format(printf, 1, 2)]] std::string printed(const char* format, ...) {
+    std::string buffer(traceBufferSize, '\0');
+    std::va_list arguments;
+    va_start(arguments, format);
+    std::vsnprintf(buffer.data(), buffer.size(), format, arguments);
+    va_end(arguments);
+    return buffer;
+}
+
+TEST(Trace, BuffersAreAsTheLibraryPrintsThem) {
+    std::mt19937 random(20);
+    const auto anyText = [&random] {
+        constexpr std::string_view alphabet = "abc %sdn'/\\\"\n\x80\xff";
+        // Short ones, ones about the size of a block that is copied, and ones that are cut.
+        const std::size_t longest = random() % 8 == 0 ? 700 : 70;
+        std::string text(random() % longest, '\0');
+        for (char& character : text) {
+            character = alphabet[random() % alphabet.size()];
+        }
+        return text;
+    };
+    for (int round = 0; round < 5'000; ++round) {
+        const std::string one = anyText();
+        const std::string other = anyText();
+        const std::string third = anyText();
+        const char* const a = one.c_str();
+        const char* const b = other.c_str();
+        const char* const c = third.c_str();
+        const auto line = static_cast<unsigned>(random() >> (random() % 32));
+        const auto number = static_cast<unsigned>(random() >> (random() % 32));
+        const int n = static_cast<int>(line);
+        ASSERT_EQ(bufferOf(trace(a, b, line, c)),
+                  printed("VARIABLE: '%s' has Value '%s' at line %d in %s", a, c, n, b));
+        ASSERT_EQ(bufferOf(trace(a, b, line, number)),
+                  printed("VARIABLE: '%s' has Value '%d' at line %d in %s", a,
+                          static_cast<int>(number), n, b));
+        ASSERT_EQ(bufferOf(trace(a, b, line, entering)),
+                  printed("ENTERING: %s() in %s [Line: %d]", b, a, n));
+        ASSERT_EQ(bufferOf(trace(a, b, line, exiting)),
+                  printed("EXITING: %s() in %s [Line: %d]", b, a, n));
+        ASSERT_EQ(bufferOf(trace(a, b, line, method)),
+                  printed("METHOD: %s() was invoked in %s [Line: %d]", b, a, n));
+        ASSERT_EQ(bufferOf(trace(a, b, line, message)),
+                  printed("MESSAGE [File: %s, Line: %d]: %s", a, n, b));
+        ASSERT_EQ(bufferOf(tracepara(a, b, line, c, entering)),
+                  printed("ENTERING: %s() in %s [Line: %d],Parameters List: %s", b, a, n, c));
+        ASSERT_EQ(bufferOf(tracepara(a, b, line, c, exiting)),
+                  printed("EXITING: %s() in %s [Line: %d],Parameters List: %s", b, a, n, c));
+        ASSERT_EQ(
+            bufferOf(tracepara(a, b, line, c, method)),
+            printed("METHOD: %s() was invoked in %s [Line: %d],Parameters List: %s", b, a, n, c));
+        ASSERT_EQ(bufferOf(tracepara(a, b, line, c, message)),
+                  printed("MESSAGE [File: %s, Line: %d]: %s,Parameters List: %s", a, n, b, c));
+    }
+}
+
+/// A point's line stays in the buffer of the helper that makes such lines.
+TEST(Trace, PointsUseTheBuffersOfTheHelpers) {
+    const LogCapture capture;
+    const std::string logger = loggerCategory;
+    const TraceSource source{"f", logger};
+    const char* const plain = trace("f", "a much longer text than what follows", 1, message);
+    const char* const withParameters = tracepara("f", "a much longer text too", 1, "", message);
+    const char* const text = trace("a much longer name", "f", 1, "a much longer value");
+    const char* const number = trace("a much longer name", "f", 1, 1U);
+    {
+        const TraceScope scope({source, "g", 5});
+        EXPECT_EQ(bufferOf(plain), padded("ENTERING: g() in f [Line: 5]"));
+    }
+    EXPECT_EQ(bufferOf(plain), padded("EXITING: g() in f [Line: 5]"));
+    traceMethod({source, "g", 5});
+    EXPECT_EQ(bufferOf(plain), padded("METHOD: g() was invoked in f [Line: 5]"));
+    traceMessage({source, "g", 5}, "m");
+    EXPECT_EQ(bufferOf(plain), padded("MESSAGE [File: f, Line: 5]: m"));
+    {
+        const ParameterScope scope({source, "g", 5}, " a=", 1U);
+        EXPECT_EQ(bufferOf(withParameters),
+                  padded("ENTERING: g() in f [Line: 5],Parameters List:  a=1"));
+    }
+    EXPECT_EQ(bufferOf(withParameters),
+              padded("EXITING: g() in f [Line: 5],Parameters List:  a=1"));
+    traceVariable({source, "g", 5}, "v", "1");
+    EXPECT_EQ(bufferOf(text), padded("VARIABLE: 'v' has Value '1' at line 5 in f"));
+    traceVariable({source, "g", 5}, "v", 1U);
+    EXPECT_EQ(bufferOf(number), padded("VARIABLE: 'v' has Value '1' at line 5 in f"));
 }
 
 TEST(Trace, TextIsValidUntilTheNextCallOfTheSameHelper) {

@@ -12,8 +12,9 @@ class TemporaryFile;
 namespace cimom::wbem {
 
 /// A long text that grows at its end, of which memory holds a small part: the rest
-/// is in a temporary file. First written, by one thread at a time; then read, by
-/// any number of threads.
+/// is in a temporary file. Two of all at a time have memory for some megabytes, which stays with
+/// the process: getting pages for a file, and giving them back, takes longer than filling them.
+/// First written, by one thread at a time; then read, by any number of threads.
 class Spool {
   public:
     /// Of more than that, append() throws CimError with serverLimitsExceeded.
@@ -33,7 +34,11 @@ class Spool {
     void read(std::size_t position, std::size_t size, std::string& out) const;
 
   private:
+    class Spares;
+
     const std::size_t largest_;
+    std::shared_ptr<Spares> spares_;  ///< to which rest_ goes back; null: nowhere
+    bool hadRoom_ = false;            ///< whether there has been a chance for a spare text
     std::unique_ptr<TemporaryFile> file_;
     std::size_t written_ = 0;  ///< bytes of the file
     std::string rest_;         ///< what follows them

@@ -5,11 +5,38 @@
 #include <concepts>
 #include <cstddef>
 #include <cstdint>
+#include <cstring>
+#include <memory>
 #include <string>
 #include <string_view>
 #include <type_traits>
 
 namespace TKLog {
+
+/// Copies the few bytes of a piece of a message, without the call or the string instruction that
+/// compilers make of memcpy: either costs more than the copying. The texts must not overlap.
+inline void copyPiece(char* out, const char* in, std::size_t size) noexcept {
+    // A run of blocks, and a last one that overlaps the run.
+    const auto inBlocks = [=]<std::size_t block>() {
+        for (std::size_t done = 0; done + block < size; done += block) {
+            std::memcpy(out + done, in + done, block);
+        }
+        std::memcpy(out + size - block, in + size - block, block);
+    };
+    if (size >= 32) {
+        inBlocks.template operator()<32>();
+    } else if (size >= 16) {
+        inBlocks.template operator()<16>();
+    } else if (size >= 8) {
+        inBlocks.template operator()<8>();
+    } else if (size >= 4) {
+        inBlocks.template operator()<4>();
+    } else {
+        for (std::size_t done = 0; done < size; ++done) {
+            out[done] = in[done];
+        }
+    }
+}
 
 /// Builds one message text piece by piece. Works in a buffer of its own up to
 /// 512 bytes and on the heap beyond. Used by one thread at a time.
@@ -22,8 +49,9 @@ class TKMessageBuffer {
     TKMessageBuffer() noexcept {}
 
     TKMessageBuffer& operator<<(std::string_view text) {
-        if (heap_.empty() && text.size() <= inlineSize - size_) {
-            size_ += text.copy(inline_.data() + size_, text.size());
+        if (!heap_ && text.size() <= inlineSize - size_) [[likely]] {
+            copyPiece(inline_.data() + size_, text.data(), text.size());
+            size_ += text.size();
         } else {
             spill(text);
         }
@@ -54,7 +82,7 @@ class TKMessageBuffer {
 
     /// What was written so far; valid until the next piece or the buffer's end.
     [[nodiscard]] std::string_view str() const noexcept {
-        return heap_.empty() ? std::string_view(inline_.data(), size_) : std::string_view(heap_);
+        return heap_ ? std::string_view(*heap_) : std::string_view(inline_.data(), size_);
     }
 
   private:
@@ -63,7 +91,7 @@ class TKMessageBuffer {
 
     std::array<char, inlineSize> inline_;
     std::size_t size_ = 0;
-    std::string heap_;
+    std::unique_ptr<std::string> heap_;  ///< null while the text fits
 };
 
 }  // namespace TKLog

@@ -1,5 +1,6 @@
 #include <gtest/gtest.h>
 
+#include <array>
 #include <cstdlib>
 #include <memory>
 #include <string>
@@ -53,10 +54,23 @@ std::string content(const Spool& spool) {
     return text;
 }
 
-TEST(Spool, GivesBackWhatItGotWhereverThatIs) {
-    Spool spool(1'000'000);
+/// Makes the memory that spools share be in use, as long as it lives: others go to the disk.
+class OtherSpools {
+  public:
+    OtherSpools() {
+        for (Spool& each : spools_) {
+            each.append(std::string(70'000, 'o'));
+        }
+    }
+
+  private:
+    std::array<Spool, 2> spools_{Spool(100'000), Spool(100'000)};
+};
+
+void expectWhatItGot(int pieces) {
+    Spool spool(10'000'000);
     std::string expected;
-    for (int count = 0; count < 30'000; ++count) {
+    for (int count = 0; count < pieces; ++count) {
         const std::string piece = std::to_string(count) + ',';
         spool.append(piece);
         expected += piece;
@@ -71,7 +85,22 @@ TEST(Spool, GivesBackWhatItGotWhereverThatIs) {
     }
 }
 
-TEST(Spool, ForgetsWhatIsCut) {
+TEST(Spool, GivesBackWhatItGotFromMemory) {
+    expectWhatItGot(30'000);
+    // The memory is used again.
+    expectWhatItGot(30'000);
+}
+
+TEST(Spool, GivesBackWhatItGotFromTheDisk) {
+    const OtherSpools others;
+    expectWhatItGot(30'000);
+}
+
+TEST(Spool, GivesBackWhatIsTooMuchForItsMemory) {
+    expectWhatItGot(400'000);
+}
+
+void expectToForgetWhatIsCut() {
     Spool spool(1'000'000);
     spool.append("kept");
     spool.append("forgotten");
@@ -86,6 +115,12 @@ TEST(Spool, ForgetsWhatIsCut) {
     EXPECT_EQ(content(spool), "kept and more" + std::string(100'000, 'y'));
     spool.cut(200'000);
     EXPECT_EQ(spool.size(), 100'013U);
+}
+
+TEST(Spool, ForgetsWhatIsCut) {
+    expectToForgetWhatIsCut();
+    const OtherSpools others;
+    expectToForgetWhatIsCut();
 }
 
 TEST(Spool, HasALimit) {
@@ -105,6 +140,7 @@ TEST(Spool, TellsThatThereIsNoRoomOnTheDisk) {
     const char* const before = std::getenv("TMPDIR");
     const std::string kept = before == nullptr ? "" : before;
     ::setenv("TMPDIR", "/nowhere", 1);
+    const OtherSpools others;
     Spool spool(1'000'000);
     spool.append("short results need no disk");
     try {
