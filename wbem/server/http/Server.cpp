@@ -66,7 +66,9 @@ void giveLongBlocksBack() {
     static_cast<void>(::mallopt(M_MMAP_THRESHOLD, longBlock));
 }
 /// Gives back what threads have freed between what they still use.
-void giveFreedBack() { ::malloc_trim(0); }
+void giveFreedBack() {
+    ::malloc_trim(0);
+}
 #else
 void giveLongBlocksBack() {}
 void giveFreedBack() {}
