@@ -20,7 +20,7 @@ set(ZR_GNU_WARNINGS -Wduplicated-branches -Wduplicated-cond -Wlogical-op -Wno-re
 # of a header, and where it puts much into one function it sees faults in the standard
 # library that are not there.
 if(ZR_COMPILED_TOGETHER)
-    list(APPEND ZR_GNU_WARNINGS -Wno-subobject-linkage -Wno-null-dereference -Wno-array-bounds
+    list(APPEND ZR_GNU_WARNINGS $<$<COMPILE_LANGUAGE:CXX>:-Wno-subobject-linkage> -Wno-null-dereference -Wno-array-bounds
          -Wno-stringop-overflow -Wno-stringop-overread)
 endif()
 

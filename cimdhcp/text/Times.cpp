@@ -2,8 +2,10 @@
 
 #include <algorithm>
 #include <array>
+#include <chrono>
+#include <concepts>
 #include <cstddef>
-#include <ctime>
+#include <string>
 
 namespace cimdhcp {
 
@@ -20,6 +22,13 @@ constexpr std::array<Unit, 4> units{
 
 constexpr std::int64_t firstMoment = 0;
 constexpr std::int64_t lastMoment = 253'402'300'799;  // 9999-12-31T23:59:59Z
+
+/// With zeros in front.
+std::string padded(std::integral auto number, std::size_t width) {
+    std::string digits = std::to_string(number);
+    digits.insert(0, width - std::min(width, digits.size()), '0');
+    return digits;
+}
 
 }  // namespace
 
@@ -54,13 +63,19 @@ std::string relativeText(std::int64_t moment, std::int64_t now) {
 }
 
 std::string isoText(std::int64_t moment) {
-    const std::time_t time = std::clamp(moment, firstMoment, lastMoment);
-    std::tm parts{};
-    if (::gmtime_r(&time, &parts) == nullptr) {
-        return {};  // not of a year within these bounds
-    }
-    std::array<char, 32> text{};
-    return {text.data(), std::strftime(text.data(), text.size(), "%Y-%m-%dT%H:%M:%SZ", &parts)};
+    // Not by the C library, whose time ends in 2038 where it has 32 bits.
+    const std::chrono::sys_seconds time{
+        std::chrono::seconds(std::clamp(moment, firstMoment, lastMoment))};
+    const auto day = std::chrono::floor<std::chrono::days>(time);
+    const std::chrono::year_month_day date(day);
+    const std::chrono::hh_mm_ss clock(time - day);
+    std::string text = padded(static_cast<int>(date.year()), 4);
+    text += '-' + padded(static_cast<unsigned>(date.month()), 2);
+    text += '-' + padded(static_cast<unsigned>(date.day()), 2);
+    text += 'T' + padded(clock.hours().count(), 2);
+    text += ':' + padded(clock.minutes().count(), 2);
+    text += ':' + padded(clock.seconds().count(), 2);
+    return text + 'Z';
 }
 
 }  // namespace cimdhcp

@@ -43,7 +43,7 @@ PropertyIndex::PropertyIndex(const std::vector<PropertyDeclaration>& properties)
     for (std::size_t position = 0; position < properties.size(); ++position) {
         const PropertyDeclaration& property = properties[position];
         const std::uint64_t hash = NameKey(property.name).hash();
-        std::size_t at = hash;
+        auto at = static_cast<std::size_t>(hash);
         while (slots_[at & (slots_.size() - 1)].number != 0) {
             ++at;
         }
@@ -62,7 +62,7 @@ const PropertyDeclaration* PropertyIndex::find(const std::vector<PropertyDeclara
                          [&name](const auto& each) { return sameName(each.name, name.text()); });
         return found == properties.end() ? nullptr : &*found;
     }
-    for (std::size_t at = name.hash();; ++at) {
+    for (auto at = static_cast<std::size_t>(name.hash());; ++at) {
         const Slot& slot = slots_[at & (slots_.size() - 1)];
         if (slot.number == 0) {
             return nullptr;

@@ -7,6 +7,7 @@
 #include <cerrno>
 #include <cstdint>
 #include <cstdlib>
+#include <ctime>
 #include <filesystem>
 #include <fstream>
 #include <stdexcept>
@@ -55,7 +56,10 @@ class TemporaryDirectory {
     }
     /// Sets when a file was last written, in seconds since the epoch.
     void age(std::string_view below, std::int64_t seconds) const {
-        const timespec time{.tv_sec = seconds, .tv_nsec = 0};
+        const timespec time{.tv_sec = static_cast<std::time_t>(seconds), .tv_nsec = 0};
+        if (time.tv_sec != seconds) {
+            throw std::invalid_argument("not a time on each processor: 32 bits end in 2038");
+        }
         const std::array<timespec, 2> times{time, time};
         if (::utimensat(AT_FDCWD, path(below).c_str(), times.data(), 0) != 0) {
             throw std::system_error(errno, std::generic_category(), path(below));

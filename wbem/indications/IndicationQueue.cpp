@@ -105,18 +105,19 @@ void IndicationQueue::read(std::string_view content) {
             continue;
         }
         line.remove_prefix(std::min<std::size_t>(line.size(), 1));
-        const auto size = takeNumber(line);
-        if (!size || !line.empty() || *size > longestFile) {
+        const auto told = takeNumber(line);
+        if (!told || !line.empty() || *told > longestFile) {
             throw std::runtime_error("it has an indication without a length");
         }
-        if (content.size() <= *size) {
+        const auto size = static_cast<std::size_t>(*told);
+        if (content.size() <= size) {
             break;
         }
-        if (content[*size] != '\n') {
+        if (content[size] != '\n') {
             throw std::runtime_error("it has an indication of another length");
         }
-        entries.push_back({*id, 0, std::string(content.substr(0, *size))});
-        content.remove_prefix(*size + 1);
+        entries.push_back({*id, 0, std::string(content.substr(0, size))});
+        content.remove_prefix(size + 1);
         nextId_ = std::max(nextId_, *id + 1);
     }
     entries_ = std::move(entries);

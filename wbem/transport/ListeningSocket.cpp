@@ -60,11 +60,13 @@ void ListeningSocket::close() noexcept {
 
 std::string addressText(const sockaddr* address) {
     std::array<char, INET6_ADDRSTRLEN> text{};
+    // Whoever hands out an address has aligned it for its family.
+    const void* const bytes = address;
     const void* number = nullptr;
     if (address != nullptr && address->sa_family == AF_INET) {
-        number = &reinterpret_cast<const sockaddr_in*>(address)->sin_addr;
+        number = &static_cast<const sockaddr_in*>(bytes)->sin_addr;
     } else if (address != nullptr && address->sa_family == AF_INET6) {
-        number = &reinterpret_cast<const sockaddr_in6*>(address)->sin6_addr;
+        number = &static_cast<const sockaddr_in6*>(bytes)->sin6_addr;
     }
     const bool known = number != nullptr &&
                        ::inet_ntop(address->sa_family, number, text.data(), text.size()) != nullptr;

@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <cstdint>
 
 #include "zrcommon/Strings.h"
 #include "zrcommon/UniqueFd.h"
@@ -34,12 +35,12 @@ std::optional<std::size_t> sizeOf(const UniqueFd& fd, std::size_t limit) {
         errno = S_ISDIR(status.st_mode) ? EISDIR : EINVAL;
         return std::nullopt;
     }
-    const auto size = static_cast<std::size_t>(status.st_size);
-    if (size > limit) {
+    // A file may be larger than a process's memory could be.
+    if (static_cast<std::uintmax_t>(status.st_size) > limit) {
         errno = EFBIG;
         return std::nullopt;
     }
-    return size;
+    return static_cast<std::size_t>(status.st_size);
 }
 
 ssize_t readSome(const UniqueFd& fd, char* room, std::size_t size) {

@@ -4,9 +4,15 @@
 
 #include <cstddef>
 
-#define LAYOUT_SIZE(type, bytes) static_assert(sizeof(type) == (bytes), #type);
-#define LAYOUT_OFFSET(type, member, bytes) \
-    static_assert(offsetof(type, member) == (bytes), #type "." #member);
+#if __SIZEOF_POINTER__ == 8
+#define LAYOUT_BYTES(wide, narrow) (wide)
+#else
+#define LAYOUT_BYTES(wide, narrow) (narrow)
+#endif
+#define LAYOUT_SIZE(type, wide, narrow) \
+    static_assert(sizeof(type) == LAYOUT_BYTES(wide, narrow), #type);
+#define LAYOUT_OFFSET(type, member, wide, narrow) \
+    static_assert(offsetof(type, member) == LAYOUT_BYTES(wide, narrow), #type "." #member);
 #include "layout.inc"
 #undef LAYOUT_SIZE
 #undef LAYOUT_OFFSET
@@ -16,8 +22,8 @@ extern "C" int layoutRowsCheckedAsC(void);
 namespace {
 
 constexpr int rowsCheckedAsCxx = 0
-#define LAYOUT_SIZE(type, bytes) +1
-#define LAYOUT_OFFSET(type, member, bytes) +1
+#define LAYOUT_SIZE(type, wide, narrow) +1
+#define LAYOUT_OFFSET(type, member, wide, narrow) +1
 #include "layout.inc"
     ;
 #undef LAYOUT_SIZE

@@ -8,6 +8,7 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <cstdio>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
@@ -52,6 +53,15 @@ inline void PrintTo(const IpAddress& address, std::ostream* out) {
 }
 inline void PrintTo(const InterfaceName& name, std::ostream* out) {
     *out << name.view();
+}
+
+/// An address in the kernel's tables of sockets: its bytes in memory, as this machine's number.
+inline std::string asTheKernelPrints(const std::array<std::uint8_t, 4>& address) {
+    std::uint32_t number = 0;
+    std::memcpy(&number, address.data(), sizeof number);
+    std::array<char, 9> text{};
+    static_cast<void>(std::snprintf(text.data(), text.size(), "%08X", number));
+    return text.data();
 }
 
 /// A captured file of a real client, by "MACHINE/FILE": a file of a directory, or what

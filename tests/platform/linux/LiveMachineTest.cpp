@@ -439,8 +439,9 @@ TEST_F(LiveMachineTest, ProcessesThatAreNotClientsAreNotAChange) {
 
 TEST_F(LiveMachineTest, ASocketThatComesOrGoesShowsWithinASecond) {
     const std::string udp = "/proc/thread-self/net/udp";
-    const std::string line =
-        "1: 010200C0:0044 630200C0:0043 01 00000000:00000000 00:00000000 00000000 0\n";
+    const std::string line = "1: " + asTheKernelPrints({192, 0, 2, 1}) + ":0044 " +
+                             asTheKernelPrints({192, 0, 2, 99}) +
+                             ":0043 01 00000000:00000000 00:00000000 00000000 0\n";
     LiveMachine& machine = open(readings(3, address(2, {192, 0, 2, 1})));
     root_.write(udp, line);
     EXPECT_EQ(valueOf(*machine.read(), "eth1", Properties::DHCPServerAddresses),

@@ -20,13 +20,15 @@ constexpr std::size_t largePiece = std::size_t{256} << 10U;
 AddressKey addressKey(const sockaddr* address) {
     constexpr std::size_t network = 8;  // bytes of an IPv6 address
     AddressKey key{};
+    // Whoever hands out an address has aligned it for its family.
+    const void* const bytes = address;
     if (address != nullptr && address->sa_family == AF_INET) {
-        const auto& number = reinterpret_cast<const sockaddr_in*>(address)->sin_addr;
+        const auto& number = static_cast<const sockaddr_in*>(bytes)->sin_addr;
         // As in an IPv4-mapped IPv6 address, which has no such network.
         key[10] = key[11] = 0xFF;
         std::memcpy(&key[12], &number, sizeof number);
     } else if (address != nullptr && address->sa_family == AF_INET6) {
-        const auto& number = reinterpret_cast<const sockaddr_in6*>(address)->sin6_addr;
+        const auto& number = static_cast<const sockaddr_in6*>(bytes)->sin6_addr;
         const bool isFour = IN6_IS_ADDR_V4MAPPED(&number) != 0;
         std::memcpy(key.data(), &number, isFour ? key.size() : network);
     }

@@ -55,6 +55,9 @@ PageArguments argumentsOf(MHD_Connection* connection) {
     return arguments;
 }
 
+// Other C libraries than GNU's have neither these calls nor their reason: their allocators give
+// long blocks back.
+#ifdef __GLIBC__
 /// Sees to it that what long requests had goes back at once: by itself, the allocator would keep
 /// ever larger blocks for the next ones, in pieces between what lasts.
 void giveLongBlocksBack() {
@@ -62,6 +65,14 @@ void giveLongBlocksBack() {
     // Cannot fail: the value is one of those that are allowed.
     static_cast<void>(::mallopt(M_MMAP_THRESHOLD, longBlock));
 }
+/// Gives back what threads have freed between what they still use.
+void giveFreedBack() {
+    ::malloc_trim(0);
+}
+#else
+void giveLongBlocksBack() {}
+void giveFreedBack() {}
+#endif
 
 /// Sees to it that the process may have a descriptor for each connection and its response.
 /// Throws ServerError.
@@ -239,8 +250,7 @@ class Server::Implementation {
             dispatcher_.endOverdue();
             shares_.tidy();
             if (shares_.gaveMuch()) {
-                // What the threads have freed between what they still use goes back, too.
-                ::malloc_trim(0);
+                giveFreedBack();
             }
             tellOfTurnedAway();
             watch();

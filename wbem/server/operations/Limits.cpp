@@ -1,5 +1,6 @@
 #include "wbem/Limits.h"
 
+#include <cstdint>
 #include <stdexcept>
 #include <string>
 
@@ -7,7 +8,8 @@ namespace cimom::wbem {
 
 namespace {
 
-void checkRange(const char* name, std::size_t value, std::size_t least, std::size_t most) {
+// All numbers have 64 bits, as sums and bounds may be beyond what a size can be.
+void checkRange(const char* name, std::uint64_t value, std::uint64_t least, std::uint64_t most) {
     if (value < least || value > most) {
         throw std::invalid_argument(std::string(name) + " is " + std::to_string(value) +
                                     "; it may be " + std::to_string(least) + " to " +
@@ -15,13 +17,14 @@ void checkRange(const char* name, std::size_t value, std::size_t least, std::siz
     }
 }
 
-void checkSeconds(const char* name, std::chrono::seconds value, std::size_t most) {
+void checkSeconds(const char* name, std::chrono::seconds value, std::uint64_t most) {
     // A negative number is far above any range.
-    checkRange(name, static_cast<std::size_t>(value.count()), 1, most);
+    checkRange(name, static_cast<std::uint64_t>(value.count()), 1, most);
 }
 
-constexpr std::size_t kibi = 1024;
-constexpr std::size_t day = 86400;
+constexpr std::uint64_t kibi = 1024;
+constexpr std::uint64_t tebi = kibi * kibi * kibi * kibi;
+constexpr std::uint64_t day = 86400;
 
 }  // namespace
 
@@ -35,12 +38,12 @@ void Limits::check() const {
     checkRange("max-connection-rate", connectionRate, 1, 65536);
     checkRange("max-checks-each", checksEach, 1, 65536);
     checkRange("max-refusals-each", refusalsEach, 1, 65536);
-    checkRange("max-memory", memory, kibi * kibi, std::size_t{1} << 40U);
+    checkRange("max-memory", memory, kibi * kibi, tebi);
     checkRange("workers", workers, 1, 256);
     checkRange("max-stuck", stuck, 1, 256);
     checkRange("io-threads", ioThreads, 1, 64);
     checkRange("max-waiting", waiting, 1, 65536);
-    checkRange("max-result", result, kibi, std::size_t{1} << 40U);
+    checkRange("max-result", result, kibi, tebi);
     checkSeconds("head-timeout", head, day);
     checkSeconds("request-timeout", request, day);
     checkSeconds("answer-timeout", response, day);
@@ -53,8 +56,8 @@ void Limits::check() const {
     }
     // An address has half of the memory, in which one request has to fit: its body, which has up
     // to twice its length while it arrives, and what is read from it.
-    constexpr std::size_t timesBody = 40;
-    constexpr std::size_t least = kibi * kibi;
+    constexpr std::uint64_t timesBody = 40;
+    constexpr std::uint64_t least = kibi * kibi;
     if (memory < least + timesBody * body) {
         throw std::invalid_argument("max-memory is below " +
                                     std::to_string(least + timesBody * body) + ", " +

@@ -43,7 +43,7 @@ class NetworkdTest : public testing::Test {
     void link(const std::string& index, const std::string& text) const {
         // It is written once the files of its configuration are applied.
         root_.write("/run/systemd/netif/links/" + index, text);
-        root_.age("/run/systemd/netif/links/" + index, 4'000'000'000);
+        root_.age("/run/systemd/netif/links/" + index, 2'000'000'000);
     }
 
     TemporaryDirectory root_;

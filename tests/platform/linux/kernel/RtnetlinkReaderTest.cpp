@@ -48,7 +48,7 @@ std::vector<Step> someAddresses() {
 class RtnetlinkReaderTest : public testing::Test {
   protected:
     NetworkState read(std::deque<std::vector<Step>> responses,
-                      milliseconds time = milliseconds{200}) {
+                      milliseconds time = milliseconds{2000}) {
         auto transport = std::make_unique<ScriptedTransport>(std::move(responses));
         transport_ = transport.get();
         reader_ = std::make_unique<RtnetlinkReader>(std::move(transport));
@@ -286,7 +286,7 @@ TEST_F(RtnetlinkReaderTest, AfterTheDeadlineNothingIsAskedForAgain) {
 
 TEST_F(RtnetlinkReaderTest, AfterAFailureTheNextReadingBeginsAnew) {
     EXPECT_THAT(read({{parts({refusal(EBUSY)})}, someLinks(), someAddresses()}).links, IsEmpty());
-    const NetworkState state = reader_->read(steady_clock::now() + milliseconds{200});
+    const NetworkState state = reader_->read(steady_clock::now() + milliseconds{2000});
     EXPECT_THAT(names(state), ElementsAre("lo", "eth0"));
     EXPECT_EQ(transport_->opened(), 2);
 }
@@ -377,7 +377,7 @@ TEST_F(RtnetlinkReaderTest, ASocketThatCannotBeOpenedIsAReason) {
     auto transport = std::make_unique<ScriptedTransport>(std::deque<std::vector<Step>>{});
     transport->refuseToOpen(EMFILE);
     RtnetlinkReader reader{std::move(transport)};
-    const NetworkState state = reader.read(steady_clock::now() + milliseconds{200});
+    const NetworkState state = reader.read(steady_clock::now() + milliseconds{2000});
     EXPECT_THAT(state.links, IsEmpty());
     EXPECT_THAT(ZR::Testing::textsOf(state.diagnostics),
                 ElementsAre(HasSubstr("cannot be asked for: ")));

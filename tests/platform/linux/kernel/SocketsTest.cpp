@@ -18,11 +18,12 @@ using testing::ElementsAre;
 using testing::IsEmpty;
 
 TEST(UdpSockets, OnlyThoseOfTheClientPort) {
-    // As the kernel of a machine of low end bytes prints them.
     EXPECT_THAT(
         parseUdpSockets(
             "   sl  local_address rem_address   st tx_queue rx_queue tr tm->when retrnsmt   uid\n"
-            "  142: 076433C6:0044 016433C6:0043 01 00000000:00000000 00:00000000 00000000     0\n"
+            "  142: " +
+            asTheKernelPrints({198, 51, 100, 7}) + ":0044 " + asTheKernelPrints({198, 51, 100, 1}) +
+            ":0043 01 00000000:00000000 00:00000000 00000000     0\n"
             "  143: 00000000:0044 00000000:0000 07 00000000:00000000 00:00000000 00000000  1000\n"
             "  144: 00000000:0043 00000000:0000 07 00000000:00000000 00:00000000 00000000     0\n"),
         ElementsAre(PortSocket{.address = "198.51.100.7"_ip, .peer = "198.51.100.1"_ip},
