@@ -150,6 +150,14 @@ class Execution {
     const Outputs& outputs_;
 };
 
+Look lookOf(const Command& command) {
+    const bool again = std::holds_alternative<ServeCommand>(command) ||
+                       std::holds_alternative<WatchCommand>(command) ||
+                       std::holds_alternative<RenameCommand>(command) ||
+                       std::holds_alternative<ModifyCommand>(command);
+    return again ? Look::again : Look::once;
+}
+
 Style styleFor(const Options& options, bool terminal) {
     return {!options.table.noHeader,
             wantsColor(options.color, terminal, std::getenv("NO_COLOR"), std::getenv("TERM"))};
@@ -186,7 +194,7 @@ void withClientOf(const Options& options, const std::function<void(Client&)>& us
         use(client);
     } else {
         std::ostringstream unheard;
-        setUpPlatform(options, unheard);
+        setUpPlatform(options, Look::once, unheard);
         use(*openClient(options));
     }
 }
@@ -223,7 +231,7 @@ ExitStatus runLine(const CommandLine& line, const Outputs& outputs, const Style&
     if (!std::holds_alternative<UserAddCommand>(line.command) &&
         !std::holds_alternative<ExporterCommand>(line.command) &&
         !std::holds_alternative<CheckCommand>(line.command)) {
-        setUpPlatform(line.options, outputs.err);
+        setUpPlatform(line.options, lookOf(line.command), outputs.err);
         requireDataDirectory(line.options);
     }
     std::visit(Execution(line, presentation, outputs), line.command);

@@ -60,7 +60,8 @@ class Examination {
         std::ostringstream warnings;
         std::optional<Failure> failure;
         try {
-            setUpPlatform(options_, warnings);
+            // Whether the machine can be watched is to be seen, too.
+            setUpPlatform(options_, Look::again, warnings);
         } catch (const Failure& error) {
             failure = error;
         }
