@@ -92,8 +92,9 @@ class Execution {
     void operator()(const CheckCommand& /*command*/) const {
         std::vector<Finding> findings;
         {
-            const WaitingLine waiting = waitingLine();
-            findings = check(line_.options, installations(executableFile()), presentation_.now);
+            WaitingLine waiting = waitingLine();
+            findings = check(line_.options, installations(executableFile()), presentation_.now,
+                             waiting.steps());
         }
         outputs_.out << (presentation_.json() ? findingsJson(findings) : findingsText(findings));
         if (!isGood(findings)) {
@@ -116,9 +117,9 @@ class Execution {
         tellOfTree();
         Outcome outcome;
         {
-            const WaitingLine waiting = waitingLine();
+            WaitingLine waiting = waitingLine();
             const auto client = openClient(line_.options);
-            outcome = carryOut(line_.command, *client, presentation_);
+            outcome = carryOut(line_.command, *client, presentation_, waiting.steps());
         }
         outputs_.out << outcome.text;
         outputs_.err << outcome.diagnostics;

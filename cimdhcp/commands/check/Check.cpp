@@ -32,8 +32,8 @@ using Verdict = Finding::Verdict;
 class Examination {
   public:
     Examination(const Options& options, const std::vector<Directories>& installations,
-                std::int64_t now)
-        : options_(options), installations_(installations), now_(now) {}
+                std::int64_t now, const TellStep& tell)
+        : options_(options), installations_(installations), now_(now), tell_(tell) {}
 
     std::vector<Finding> examine() {
         const bool machine = lookAtSettings();
@@ -236,7 +236,9 @@ class Examination {
     void lookAtClasses() {
         std::vector<Said> failed;
         std::vector<Said> empty;
+        std::size_t step = 0;
         for (const cimom::Registration& registration : client_->registrations()) {
+            tell_("asking for " + registration.className, ++step, client_->registrations().size());
             if (!registration.instance || registration.nameSpaces.empty()) {
                 continue;
             }
@@ -274,6 +276,7 @@ class Examination {
     const Options& options_;
     const std::vector<Directories>& installations_;
     std::int64_t now_;
+    const TellStep& tell_;
     std::vector<Finding> findings_;
     std::optional<EmbeddedClient> client_;
     std::size_t dhcpInterfaces_ = 0;
@@ -282,8 +285,8 @@ class Examination {
 }  // namespace
 
 std::vector<Finding> check(const Options& options, const std::vector<Directories>& installations,
-                           std::int64_t now) {
-    return Examination(options, installations, now).examine();
+                           std::int64_t now, const TellStep& tell) {
+    return Examination(options, installations, now, tell).examine();
 }
 
 }  // namespace cimdhcp
