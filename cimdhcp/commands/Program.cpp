@@ -19,6 +19,7 @@
 #include "client/Installation.h"
 #include "commands/ClientCommands.h"
 #include "commands/Complete.h"
+#include "commands/Exporter.h"
 #include "commands/Fleet.h"
 #include "commands/Metrics.h"
 #include "commands/Overview.h"
