@@ -31,8 +31,8 @@ constexpr bool isOneOf = (std::is_same_v<Held, Kinds> || ...);
 
 class Execution {
   public:
-    Execution(Client& client, const Presentation& presentation)
-        : client_(client), presentation_(presentation) {}
+    Execution(Client& client, const Presentation& presentation, const TellStep& tell)
+        : client_(client), presentation_(presentation), tell_(tell) {}
 
     Outcome operator()(const ShowCommand& command) const {
         const ServedInstances served = askServed(client_);
@@ -125,12 +125,16 @@ class Execution {
     }
 
     Outcome operator()(const GraphCommand& command) const {
-        const std::string text = graphvizText(graphOfMachine(client_));
-        return {command.svg ? drawSvg(text) : text, "", std::nullopt};
+        const std::string text = graphvizText(graphOfMachine(client_, tell_));
+        if (!command.svg) {
+            return {text, "", std::nullopt};
+        }
+        tell_("drawing", 0, 0);
+        return {drawSvg(text), "", std::nullopt};
     }
 
     Outcome operator()(const CheckCommand& /*command*/) const {
-        const std::vector<Finding> findings = serverFindings(client_);
+        const std::vector<Finding> findings = serverFindings(client_, tell_);
         Outcome outcome{presentation_.json() ? findingsJson(findings) : findingsText(findings), "",
                         std::nullopt};
         if (!isGood(findings)) {
@@ -234,12 +238,14 @@ class Execution {
 
     Client& client_;
     const Presentation& presentation_;
+    const TellStep& tell_;
 };
 
 }  // namespace
 
-Outcome carryOut(const Command& command, Client& client, const Presentation& presentation) {
-    return std::visit(Execution(client, presentation), command);
+Outcome carryOut(const Command& command, Client& client, const Presentation& presentation,
+                 const TellStep& tell) {
+    return std::visit(Execution(client, presentation, tell), command);
 }
 
 }  // namespace cimdhcp

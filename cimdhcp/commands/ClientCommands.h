@@ -6,6 +6,7 @@
 #include "arguments/Commands.h"
 #include "text/Failure.h"
 #include "text/Presentation.h"
+#include "text/ProgressBar.h"
 
 namespace cimdhcp {
 
@@ -18,8 +19,9 @@ struct Outcome {
     std::optional<Failure> failure;  ///< what ends the program when both are written
 };
 
-/// Carries out a command that asks an object manager. Throws Failure.
+/// Carries out a command that asks an object manager, and tells the steps of those that have
+/// many. Throws Failure.
 [[nodiscard]] Outcome carryOut(const Command& command, Client& client,
-                               const Presentation& presentation);
+                               const Presentation& presentation, const TellStep& tell = untold);
 
 }  // namespace cimdhcp

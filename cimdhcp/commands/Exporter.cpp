@@ -1,3 +1,7 @@
+#include "commands/Exporter.h"
+
+#include <malloc.h>
+
 #include <algorithm>
 #include <array>
 #include <atomic>
@@ -11,6 +15,7 @@
 #include <nlohmann/json.hpp>
 #include <optional>
 #include <ostream>
+#include <semaphore>
 #include <string_view>
 #include <utility>
 
@@ -21,7 +26,6 @@
 #include "commands/Metrics.h"
 #include "commands/Overview.h"
 #include "commands/Serve.h"
-#include "commands/ServerAccess.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
 #include "text/Times.h"
@@ -45,96 +49,84 @@ constexpr char anyText = '\xFF';
 /// Bytes of a server's response: what one probe may cost.
 constexpr std::size_t longestProbe = 1U << 20U;
 
-/// Whether the host is of the pattern, in which each "*" stands for at least one letter, digit
-/// or hyphen, but never for a dot: a pattern grants a level of names and nothing below it.
-bool matchesHost(std::string_view pattern, std::string_view host) {
-    const auto isOfLabel = [](char c) {
-        return (c >= '0' && c <= '9') || (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') ||
-               c == '-';
-    };
-    if (pattern.empty()) {
-        return host.empty();
-    }
-    if (pattern.front() != anyText) {
-        return !host.empty() && cimom::sameName(pattern.substr(0, 1), host.substr(0, 1)) &&
-               matchesHost(pattern.substr(1), host.substr(1));
-    }
-    for (std::size_t length = 1; length <= host.size() && isOfLabel(host[length - 1]); ++length) {
-        if (matchesHost(pattern.substr(1), host.substr(length))) {
-            return true;
-        }
-    }
-    return false;
+bool isOfLabel(char c) noexcept {
+    return (c >= '0' && c <= '9') || (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || c == '-';
 }
 
-/// Machines that may be probed, and how.
-struct ProbeTarget {
-    ServerUrl url;  ///< its host may have anyText
-    Options options;
-    Milliseconds timeout{};
-    std::optional<ServerAccess> access;  ///< borrows the options
-
-    [[nodiscard]] bool allows(const ServerUrl& asked) const {
-        return asked.encrypted == url.encrypted && asked.port == url.port &&
-               asked.path == url.path && matchesHost(url.host, asked.host);
+/// Goes over the host once: a stranger chooses it, and signs for any text that stand side by
+/// side could be tried in very many ways.
+bool matchesHost(std::string_view pattern, std::string_view host) {
+    // Whether so many letters of the pattern stand for what was read of the host.
+    std::vector<bool> reached(pattern.size() + 1);
+    reached.front() = true;
+    for (std::size_t at = 0; at < host.size(); ++at) {
+        std::vector<bool> further(pattern.size() + 1);
+        for (std::size_t each = 0; each < pattern.size(); ++each) {
+            further[each + 1] =
+                pattern[each] == anyText
+                    ? isOfLabel(host[at]) && (reached[each] || reached[each + 1])
+                    : reached[each] && cimom::sameName(pattern.substr(each, 1), host.substr(at, 1));
+        }
+        reached = std::move(further);
     }
-};
+    return reached.back();
+}
 
-/// What the file says. Its targets do not move.
-struct ExporterSettings {
-    std::vector<std::unique_ptr<ProbeTarget>> targets;
-    Milliseconds offset{};
+[[noreturn]] void refuseSetting(const std::string& reason) {
+    throw Failure(ExitStatus::usage, printable(reason));
+}
 
-    /// The first one that allows it; null: none does.
-    [[nodiscard]] const ProbeTarget* find(const ServerUrl& asked) const {
-        const auto found = std::find_if(targets.begin(), targets.end(),
-                                        [&](const auto& each) { return each->allows(asked); });
-        return found == targets.end() ? nullptr : found->get();
-    }
-};
-
-/// Reads the configuration; each failure names the file.
-class ExporterFile {
+/// Reads the configuration.
+class ExporterReader {
   public:
-    ExporterFile(std::string file, const Options& options, const std::atomic<bool>& ending)
-        : file_(std::move(file)), options_(options), ending_(ending) {}
+    using Document = nlohmann::json;
 
-    [[nodiscard]] ExporterSettings read() const {
-        const auto text = ZR::File::read(file_);
-        if (!text) {
-            throw Failure(ExitStatus::notLoaded, printable(file_) + ": " + std::strerror(errno));
+    explicit ExporterReader(const Options& options) : options_(options) {}
+
+    [[nodiscard]] ExporterSettings read(const Document& whole) const {
+        if (!whole.is_object()) {
+            refuseSetting("an object with \"targets\" is wanted");
         }
-        try {
-            return settingsFrom(nlohmann::json::parse(*text));
-        } catch (const nlohmann::json::exception& error) {
-            refuse(error.what());
+        ExporterSettings settings;
+        Said said;
+        said.options = options_;
+        const Document* targets = nullptr;
+        for (const auto& [key, value] : whole.items()) {
+            if (key == "targets" && value.is_array()) {
+                targets = &value;
+            } else if (key == "timeoutOffset") {
+                settings.offset = seconds(value, key);
+            } else if (!take(key, value, said)) {
+                refuseSetting("\"" + key + "\" is not known here");
+            }
         }
+        if (targets == nullptr || targets->empty()) {
+            refuseSetting("\"targets\" is a list of at least one target");
+        }
+        for (const Document& each : *targets) {
+            settings.targets.push_back(targetFrom(each, said));
+        }
+        return settings;
     }
 
   private:
-    using Document = nlohmann::json;
-
-    [[noreturn]] void refuse(const std::string& reason) const {
-        throw Failure(ExitStatus::usage, printable(file_) + ": " + printable(reason));
-    }
-
     /// What is said for all targets, or for one.
     struct Said {
         Options options;
         Milliseconds timeout{10'000};
     };
 
-    [[nodiscard]] Milliseconds seconds(const Document& value, const std::string& key) const {
+    [[nodiscard]] static Milliseconds seconds(const Document& value, const std::string& key) {
         constexpr double longest = 100;
         const double number = value.get<double>();
         if (!(number > 0 && number <= longest)) {
-            refuse('"' + key + "\" is a number of seconds, above 0 and at most 100");
+            refuseSetting('"' + key + "\" is a number of seconds, above 0 and at most 100");
         }
         return std::chrono::ceil<Milliseconds>(Seconds(number));
     }
 
     /// Whether the key is one of those that stand both for all and for one.
-    bool take(const std::string& key, const Document& value, Said& said) const {
+    static bool take(const std::string& key, const Document& value, Said& said) {
         if (key == "cacert") {
             said.options.caCertificate = value.get<std::string>();
         } else if (key == "credentials") {
@@ -149,45 +141,18 @@ class ExporterFile {
         return true;
     }
 
-    [[nodiscard]] ExporterSettings settingsFrom(const Document& whole) const {
-        if (!whole.is_object()) {
-            refuse("an object with \"targets\" is wanted");
-        }
-        ExporterSettings settings;
-        settings.offset = Milliseconds(500);
-        Said said;
-        said.options = options_;
-        const Document* targets = nullptr;
-        for (const auto& [key, value] : whole.items()) {
-            if (key == "targets" && value.is_array()) {
-                targets = &value;
-            } else if (key == "timeoutOffset") {
-                settings.offset = seconds(value, key);
-            } else if (!take(key, value, said)) {
-                refuse("\"" + key + "\" is not known here");
-            }
-        }
-        if (targets == nullptr || targets->empty()) {
-            refuse("\"targets\" is a list of at least one target");
-        }
-        for (const Document& each : *targets) {
-            settings.targets.push_back(targetFrom(each, said));
-        }
-        return settings;
-    }
-
-    [[nodiscard]] std::unique_ptr<ProbeTarget> targetFrom(const Document& entry, Said said) const {
+    [[nodiscard]] static std::unique_ptr<ProbeTarget> targetFrom(const Document& entry, Said said) {
         std::string text;
         if (entry.is_string()) {
             text = entry.get<std::string>();
         } else if (!entry.is_object()) {
-            refuse("a target is a text or an object");
+            refuseSetting("a target is a text or an object");
         } else {
             for (const auto& [key, value] : entry.items()) {
                 if (key == "target") {
                     text = value.get<std::string>();
                 } else if (!take(key, value, said)) {
-                    refuse("\"" + key + "\" is not known for a target");
+                    refuseSetting("\"" + key + "\" is not known for a target");
                 }
             }
         }
@@ -196,15 +161,39 @@ class ExporterFile {
         std::replace(url.begin(), url.end(), '*', anyText);
         try {
             target->url = readServerUrl(url);
-            target->timeout = said.timeout;
-            target->options = std::move(said.options);
-            target->access.emplace(target->options, ending_);
         } catch (const Failure& failure) {
-            refuse("target \"" + text + "\": " + failure.what());
+            refuseSetting("target \"" + text + "\": " + failure.what());
         }
+        target->url.given = text;
+        target->timeout = said.timeout;
+        target->options = std::move(said.options);
         return target;
     }
 
+    const Options& options_;
+};
+
+/// The configuration, read again whenever it is asked for.
+class ExporterFile {
+  public:
+    ExporterFile(std::string file, const Options& options, const std::atomic<bool>& ending)
+        : file_(std::move(file)), options_(options), ending_(ending) {}
+
+    [[nodiscard]] ExporterSettings read() const {
+        const auto text = ZR::File::read(file_);
+        if (!text) {
+            throw Failure(ExitStatus::notLoaded, printable(file_) + ": " + std::strerror(errno));
+        }
+        try {
+            ExporterSettings settings = readExporterSettings(*text, options_);
+            settings.open(ending_);
+            return settings;
+        } catch (const Failure& failure) {
+            throw Failure(ExitStatus::usage, printable(file_) + ": " + failure.what());
+        }
+    }
+
+  private:
     const std::string file_;
     const Options& options_;
     const std::atomic<bool>& ending_;
@@ -221,6 +210,73 @@ std::optional<Milliseconds> scrapeTimeout(const PageRequest& request) {
                       number <= longest;  // "nan" is in no range
     return good ? std::optional(std::chrono::floor<Milliseconds>(Seconds(number))) : std::nullopt;
 }
+
+/// The first target that allows it; null: none does.
+const ProbeTarget* targetFor(const std::string& asked, const ExporterSettings& settings,
+                             ServerUrl& url) {
+    try {
+        url = readServerUrl(asked);
+    } catch (const Failure&) {
+        // What is not a URL is not a target either; it is not repeated.
+        return nullptr;
+    }
+    // What is the sign of patterns is not a host, nor is what no name can be.
+    constexpr std::size_t longestHost = 253;
+    if (url.host.size() > longestHost || url.host.find(anyText) != std::string::npos) {
+        return nullptr;
+    }
+    const auto found = std::find_if(settings.targets.begin(), settings.targets.end(),
+                                    [&url](const auto& each) { return each->allows(url); });
+    return found == settings.targets.end() ? nullptr : found->get();
+}
+
+/// Probes that get long responses, of which few go on at the same time, so that what they take
+/// together is bounded: targets may be hostile, and those that are not tell of a few interfaces.
+class LongProbes {
+  public:
+    [[nodiscard]] bool begin(std::chrono::steady_clock::time_point until) {
+        return free_.try_acquire_until(until);
+    }
+    void end() {
+        free_.release();
+#ifdef __GLIBC__
+        // What they took was large, and this allocator would keep it.
+        ::malloc_trim(0);
+#endif
+    }
+
+  private:
+    static constexpr std::ptrdiff_t most = 2;
+    std::counting_semaphore<most> free_{most};
+};
+
+/// What the responses to one probe may take.
+class ProbeRoom {
+  public:
+    ProbeRoom(LongProbes& others, std::chrono::steady_clock::time_point until)
+        : others_(others), until_(until) {}
+    ~ProbeRoom() {
+        if (isLong_) {
+            others_.end();
+        }
+    }
+    ProbeRoom(const ProbeRoom&) = delete;
+    ProbeRoom& operator=(const ProbeRoom&) = delete;
+
+    /// Whether there is room for more bytes; waits for it where it is necessary.
+    [[nodiscard]] bool grow(std::size_t more) {
+        constexpr std::size_t shortProbe = 65536;
+        bytes_ += more;
+        isLong_ = isLong_ || (bytes_ > shortProbe && others_.begin(until_));
+        return isLong_ || bytes_ <= shortProbe;
+    }
+
+  private:
+    LongProbes& others_;
+    const std::chrono::steady_clock::time_point until_;
+    std::size_t bytes_ = 0;
+    bool isLong_ = false;
+};
 
 class Exporter {
   public:
@@ -274,59 +330,31 @@ class Exporter {
         return settings_;
     }
 
-    Page refuse(const char* reason) {
-        ++refused_;
-        return {http::badRequest, reason};
-    }
-
     Page probe(const PageRequest& request) {
-        const std::string* asked = nullptr;
-        for (const auto& [name, value] : request.arguments) {
-            if (name == "target" && asked != nullptr) {
-                return refuse("target is given twice\n");
-            }
-            if (name == "target") {
-                asked = &value;
-            }
-        }
-        if (asked == nullptr || asked->empty()) {
-            return refuse("target is missing\n");
-        }
         const auto settings = this->settings();
-        const ProbeTarget* target = nullptr;
-        ServerUrl url;
         try {
-            url = readServerUrl(*asked);
-            // What is the sign of patterns is not a host, nor is what no name can be.
-            constexpr std::size_t longestHost = 253;
-            const bool isName =
-                url.host.size() <= longestHost && url.host.find(anyText) == std::string::npos;
-            target = isName ? settings->find(url) : nullptr;
-        } catch (const Failure&) {
-            // What is not a URL is not a target either; it is not repeated.
+            return metricsPage(ask(readProbe(request, *settings), request.arrived), request);
+        } catch (const Failure& failure) {
+            ++refused_;
+            return {http::badRequest, std::string(failure.what()) + '\n'};
         }
-        if (target == nullptr) {
-            return refuse("the configuration does not allow this target\n");
-        }
-        Milliseconds time = target->timeout;
-        if (const auto scraper = scrapeTimeout(request)) {
-            // With an offset that would leave nothing, half of it is better than none.
-            time = std::min(time, std::max(*scraper - settings->offset, *scraper / 2));
-        }
-        return metricsPage(ask(*target, url, request.arrived, time), request);
     }
 
-    MetricFamilies ask(const ProbeTarget& target, const ServerUrl& url,
-                       std::chrono::steady_clock::time_point arrived, Milliseconds time) {
+    /// Never throws Failure: what fails is what the metrics tell.
+    MetricFamilies ask(const Probe& probe, std::chrono::steady_clock::time_point arrived) {
         const auto now = [] { return std::chrono::steady_clock::now(); };
         MetricFamilies families;
         std::string reason;
+        // Until the last of what they became is gone.
+        ProbeRoom room(longProbes_, arrived + probe.time);
         try {
-            HttpSettings settings = target.access->settingsFor(url);
+            HttpSettings settings = probe.target.access.value().settingsFor(probe.url);
             settings.longestResponse = longestProbe;
+            settings.mayGrow = [&room](std::size_t more) { return room.grow(more); };
             // What it has waited for its turn is gone.
-            const auto left = std::chrono::ceil<Milliseconds>(arrived + time - now());
-            RemoteClient client(url, std::move(settings), Deadline(left), target.options.nameSpace);
+            const auto left = std::chrono::ceil<Milliseconds>(arrived + probe.time - now());
+            RemoteClient client(probe.url, std::move(settings), Deadline(left),
+                                probe.target.options.nameSpace);
             families = machineMetrics(askMachine(client, AskDiagnostics::Yes), secondsNow());
         } catch (const Failure& failure) {
             reason = failure.what();
@@ -338,7 +366,7 @@ class Exporter {
         durations_.add(took);
         ++(success ? succeeded_ : failed_);
         if (!success) {
-            log_(LogKind::request, printable(url.text()) + ": " + printable(reason));
+            log_(LogKind::request, printable(probe.url.text()) + ": " + printable(reason));
         }
         families.push_back({"probe_success",
                             MetricFamily::Kind::gauge,
@@ -390,6 +418,7 @@ class Exporter {
     const cimom::wbem::ServerLog log_;
     mutable std::mutex mutex_;  ///< of settings_
     std::shared_ptr<const ExporterSettings> settings_;
+    LongProbes longProbes_;
     cimom::wbem::DurationHistogram durations_;
     std::atomic<std::uint64_t> succeeded_{0};
     std::atomic<std::uint64_t> failed_{0};
@@ -413,6 +442,55 @@ sigset_t blockExporterSignals() {
 }
 
 }  // namespace
+
+bool ProbeTarget::allows(const ServerUrl& asked) const {
+    return asked.encrypted == url.encrypted && asked.port == url.port && asked.path == url.path &&
+           matchesHost(url.host, asked.host);
+}
+
+void ExporterSettings::open(const std::atomic<bool>& ending) {
+    for (const auto& target : targets) {
+        try {
+            target->access.emplace(target->options, ending);
+        } catch (const Failure& failure) {
+            refuseSetting("target \"" + target->url.given + "\": " + failure.what());
+        }
+    }
+}
+
+ExporterSettings readExporterSettings(const std::string& json, const Options& options) {
+    try {
+        return ExporterReader(options).read(ExporterReader::Document::parse(json));
+    } catch (const nlohmann::json::exception& error) {
+        refuseSetting(error.what());
+    }
+}
+
+Probe readProbe(const PageRequest& request, const ExporterSettings& settings) {
+    const std::string* asked = nullptr;
+    for (const auto& [name, value] : request.arguments) {
+        if (name == "target" && asked != nullptr) {
+            throw Failure(ExitStatus::usage, "target is given twice");
+        }
+        if (name == "target") {
+            asked = &value;
+        }
+    }
+    if (asked == nullptr || asked->empty()) {
+        throw Failure(ExitStatus::usage, "target is missing");
+    }
+    ServerUrl url;
+    const ProbeTarget* const target = targetFor(*asked, settings, url);
+    if (target == nullptr) {
+        throw Failure(ExitStatus::usage, "the configuration does not allow this target");
+    }
+    Milliseconds time = target->timeout;
+    if (const auto scraper = scrapeTimeout(request)) {
+        // With an offset that would leave nothing, half of it is better than none.
+        time = std::min(time, std::max(*scraper - settings.offset, *scraper / 2));
+    }
+    return {*target, std::move(url), time};
+}
 
 void serveExporter(const ExporterCommand& command, const Options& options, std::ostream& out) {
     std::atomic<bool> ending = false;

@@ -9,7 +9,6 @@
 #include "arguments/Commands.h"
 #include "client/ServerUrl.h"
 #include "commands/ClientCommands.h"
-#include "commands/Outputs.h"
 #include "text/Failure.h"
 #include "text/Presentation.h"
 

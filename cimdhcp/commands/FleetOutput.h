@@ -8,7 +8,6 @@
 #include "arguments/Commands.h"
 #include "commands/DiagnosticText.h"
 #include "commands/Fleet.h"
-#include "commands/Outputs.h"
 #include "text/Presentation.h"
 #include "text/ProgressBar.h"
 

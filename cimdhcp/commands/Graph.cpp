@@ -180,13 +180,14 @@ Graph connect(const std::vector<cimom::ObjectPath>& elements,
     return graph;
 }
 
-Graph graphOfMachine(Client& client) {
+Graph graphOfMachine(Client& client, const TellStep& tell) {
     std::vector<cimom::ObjectPath> elements;
     std::vector<cimom::ObjectPath> associations;
-    for (const ClassEntry& entry : client.servedClasses()) {
-        if (isLeftOut(entry.name)) {
-            continue;
-        }
+    std::vector<ClassEntry> classes = client.servedClasses();
+    std::erase_if(classes, [](const ClassEntry& entry) { return isLeftOut(entry.name); });
+    std::size_t number = 0;
+    for (const ClassEntry& entry : classes) {
+        tell("asking for " + entry.name, ++number, classes.size());
         std::vector<cimom::ObjectPath>& paths = entry.association ? associations : elements;
         for (cimom::ObjectPath& path : client.pathsIn(entry.name)) {
             paths.push_back(std::move(path));

@@ -5,6 +5,7 @@
 #include <vector>
 
 #include "cimom/ObjectPath.h"
+#include "text/ProgressBar.h"
 
 namespace cimdhcp {
 
@@ -42,8 +43,9 @@ struct Graph {
 [[nodiscard]] Graph connect(const std::vector<cimom::ObjectPath>& elements,
                             const std::vector<cimom::ObjectPath>& associations);
 
-/// All that the providers serve. Throws Failure for any response that is not OK.
-[[nodiscard]] Graph graphOfMachine(Client& client);
+/// All that the providers serve; each class is a step. Throws Failure for any response that is
+/// not OK.
+[[nodiscard]] Graph graphOfMachine(Client& client, const TellStep& tell = untold);
 
 /// The graph in the language of Graphviz, with everything that steers the drawing.
 [[nodiscard]] std::string graphvizText(const Graph& graph);

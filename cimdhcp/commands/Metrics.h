@@ -41,9 +41,4 @@ using AskMetrics = std::function<MetricFamilies()>;
     cimom::wbem::ServerSettings settings, AskMetrics ask, std::function<MetricFamilies()> further,
     const cimom::wbem::ServerLog& log);
 
-/// Tells Prometheus of other machines until the process gets SIGTERM or SIGINT; reads its
-/// configuration again at SIGHUP. Prints one line when it accepts connections. At most `parallel`
-/// machines are asked at the same time. Throws Failure.
-void serveExporter(const ExporterCommand& command, const Options& options, std::ostream& out);
-
 }  // namespace cimdhcp

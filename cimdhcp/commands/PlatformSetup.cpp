@@ -40,6 +40,8 @@ constexpr const char* treeVariable = "ZR_INSTRUMENTATION_TREE";
 /// request has no later one to tell of it.
 constexpr const char* waitVariable = "ZR_SERVICE_PROCESSOR_WAIT";
 constexpr const char* processorWait = "1000";
+/// Of this the environment says nothing: a server that never looked again would be no use.
+constexpr const char* onceVariable = "ZR_READ_ONCE";
 constexpr std::size_t largestTree = std::size_t{10} << 20U;  // as large as the platform reads
 
 struct Tree {
@@ -110,12 +112,13 @@ void checkTree(const std::string& path) {
 
 }  // namespace
 
-void setUpPlatform(const Options& options, std::ostream& err) {
+void setUpPlatform(const Options& options, Look look, std::ostream& err) {
     handOverTree(options.tree);
     setVariable("ZR_DATA_DIR", options.dataDir);
     if (std::getenv(waitVariable) == nullptr) {
         setVariable(waitVariable, processorWait);
     }
+    setVariable(onceVariable, look == Look::once ? "yes" : "no");
     const ZR::PlatformSettings& settings = ZR::PlatformSettings::process();
     for (const std::string& diagnostic : settings.diagnostics) {
         err << "cimdhcp: warning: " << printable(diagnostic) << '\n';

@@ -19,6 +19,7 @@
 #include "client/Installation.h"
 #include "commands/ClientCommands.h"
 #include "commands/Complete.h"
+#include "commands/Exporter.h"
 #include "commands/Fleet.h"
 #include "commands/Metrics.h"
 #include "commands/Overview.h"
@@ -92,8 +93,9 @@ class Execution {
     void operator()(const CheckCommand& /*command*/) const {
         std::vector<Finding> findings;
         {
-            const WaitingLine waiting = waitingLine();
-            findings = check(line_.options, installations(executableFile()), presentation_.now);
+            WaitingLine waiting = waitingLine();
+            findings = check(line_.options, installations(executableFile()), presentation_.now,
+                             waiting.steps());
         }
         outputs_.out << (presentation_.json() ? findingsJson(findings) : findingsText(findings));
         if (!isGood(findings)) {
@@ -116,9 +118,9 @@ class Execution {
         tellOfTree();
         Outcome outcome;
         {
-            const WaitingLine waiting = waitingLine();
+            WaitingLine waiting = waitingLine();
             const auto client = openClient(line_.options);
-            outcome = carryOut(line_.command, *client, presentation_);
+            outcome = carryOut(line_.command, *client, presentation_, waiting.steps());
         }
         outputs_.out << outcome.text;
         outputs_.err << outcome.diagnostics;
@@ -149,6 +151,14 @@ class Execution {
     const Presentation& presentation_;
     const Outputs& outputs_;
 };
+
+Look lookOf(const Command& command) {
+    const bool again = std::holds_alternative<ServeCommand>(command) ||
+                       std::holds_alternative<WatchCommand>(command) ||
+                       std::holds_alternative<RenameCommand>(command) ||
+                       std::holds_alternative<ModifyCommand>(command);
+    return again ? Look::again : Look::once;
+}
 
 Style styleFor(const Options& options, bool terminal) {
     return {!options.table.noHeader,
@@ -186,7 +196,7 @@ void withClientOf(const Options& options, const std::function<void(Client&)>& us
         use(client);
     } else {
         std::ostringstream unheard;
-        setUpPlatform(options, unheard);
+        setUpPlatform(options, Look::once, unheard);
         use(*openClient(options));
     }
 }
@@ -223,7 +233,7 @@ ExitStatus runLine(const CommandLine& line, const Outputs& outputs, const Style&
     if (!std::holds_alternative<UserAddCommand>(line.command) &&
         !std::holds_alternative<ExporterCommand>(line.command) &&
         !std::holds_alternative<CheckCommand>(line.command)) {
-        setUpPlatform(line.options, outputs.err);
+        setUpPlatform(line.options, lookOf(line.command), outputs.err);
         requireDataDirectory(line.options);
     }
     std::visit(Execution(line, presentation, outputs), line.command);

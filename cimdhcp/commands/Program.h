@@ -3,7 +3,7 @@
 #include <string>
 #include <vector>
 
-#include "commands/Outputs.h"
+#include "text/Presentation.h"
 
 namespace cimdhcp {
 

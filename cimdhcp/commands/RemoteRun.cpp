@@ -26,10 +26,10 @@ ExitStatus runRemotely(const CommandLine& line, const Presentation& presentation
     warnOfInsecurity(line.options, outputs.err);
     const Interruption interruption;
     const ServerAccess access(line.options, interruption.wanted());
-    const auto ask = [&](const ServerUrl& server) {
+    const auto ask = [&](const ServerUrl& server, const TellStep& tell) {
         try {
             RemoteClient client = access.clientOf(server);
-            return carryOut(line.command, client, presentation);
+            return carryOut(line.command, client, presentation, tell);
         } catch (const cimom::wbem::ConnectionError& error) {
             throw failureOf(error);
         }
@@ -37,9 +37,9 @@ ExitStatus runRemotely(const CommandLine& line, const Presentation& presentation
     if (!several) {
         Outcome outcome;
         try {
-            const WaitingLine waiting(outputs.err, outputs.errWidth,
-                                      "waiting for " + printable(servers.front().given));
-            outcome = ask(servers.front());
+            WaitingLine waiting(outputs.err, outputs.errWidth,
+                                "waiting for " + printable(servers.front().given));
+            outcome = ask(servers.front(), waiting.steps());
         } catch (const Failure& failure) {
             // A failure without a response of the server needs the server's name.
             const bool noResponse = failure.status() == ExitStatus::notLoaded;
@@ -62,7 +62,8 @@ ExitStatus runRemotely(const CommandLine& line, const Presentation& presentation
     }
     FleetOutput output(servers, presentation, line.options.time, outputs, errorStyle);
     askFleet(
-        servers, line.options.parallel, ask,
+        servers, line.options.parallel,
+        [&ask](const ServerUrl& server) { return ask(server, untold); },
         [&output](ServerReport&& report) { output.show(std::move(report)); },
         interruption.wanted());
     const ExitStatus status = output.finish(interruption.wanted());

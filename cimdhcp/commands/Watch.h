@@ -1,7 +1,6 @@
 #pragma once
 
 #include "arguments/Commands.h"
-#include "commands/Outputs.h"
 #include "text/Presentation.h"
 
 namespace cimdhcp {

@@ -7,8 +7,8 @@
 #include <vector>
 
 #include "client/MachineInterfaces.h"
-#include "commands/Outputs.h"
 #include "commands/WatchedChanges.h"
+#include "text/Presentation.h"
 
 namespace cimdhcp {
 

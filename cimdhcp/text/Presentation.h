@@ -2,6 +2,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <iosfwd>
 #include <optional>
 #include <string>
 #include <vector>
@@ -29,6 +30,15 @@ struct Presentation {
     [[nodiscard]] bool json() const noexcept { return format == Format::json; }
 
     bool operator==(const Presentation&) const = default;
+};
+
+/// Where they are shown.
+struct Outputs {
+    std::ostream& out;
+    std::ostream& err;
+    std::optional<std::size_t> width;  ///< of the terminal that `out` is; none: it is not one
+    /// The same for `err`.
+    std::optional<std::size_t> errWidth = std::nullopt;
 };
 
 }  // namespace cimdhcp

@@ -86,17 +86,32 @@ WaitingLine::~WaitingLine() {
     }
 }
 
+TellStep WaitingLine::steps() {
+    return [this](const std::string& doing, std::size_t number, std::size_t total) {
+        const std::lock_guard lock(mutex_);
+        doing_ = doing;
+        if (total > 0) {
+            doing_ += ", " + std::to_string(number) + " of " + std::to_string(total);
+        }
+        if (seconds_ > 0) {
+            showLocked();
+        }
+    };
+}
+
+void WaitingLine::showLocked() {
+    terminal_ << clearLine << cutToWidth(doing_ + ", " + std::to_string(seconds_) + " s", room_)
+              << std::flush;
+}
+
 void WaitingLine::run() {
     std::unique_lock lock(mutex_);
-    for (unsigned seconds = 1;; ++seconds) {
-        if (changed_.wait_for(lock, std::chrono::seconds(1), [this] { return ended_; })) {
-            if (seconds > 1) {
-                terminal_ << clearLine << std::flush;
-            }
-            return;
-        }
-        terminal_ << clearLine << cutToWidth(doing_ + ", " + std::to_string(seconds) + " s", room_)
-                  << std::flush;
+    while (!changed_.wait_for(lock, std::chrono::seconds(1), [this] { return ended_; })) {
+        ++seconds_;
+        showLocked();
+    }
+    if (seconds_ > 0) {
+        terminal_ << clearLine << std::flush;
     }
 }
 

@@ -2,6 +2,7 @@
 
 #include <condition_variable>
 #include <cstddef>
+#include <functional>
 #include <mutex>
 #include <optional>
 #include <ostream>
@@ -30,9 +31,17 @@ class ProgressBar {
     bool shown_ = false;
 };
 
-/// A line on a terminal that says how long something takes already, once it has taken a
-/// second. Without a width it shows nothing. While it exists, nothing else may be written to
-/// the stream.
+/// Takes what is being done now, and which step of how many it is; of 0, steps are not counted.
+using TellStep =
+    std::function<void(const std::string& doing, std::size_t number, std::size_t total)>;
+
+/// Takes a step that is not shown anywhere.
+inline void untold(const std::string& /*doing*/, std::size_t /*number*/,
+                   std::size_t /*total*/) noexcept {}
+
+/// A line on a terminal that says what is being done and how long it takes already, once it
+/// has taken a second. Without a width it shows nothing. While it exists, nothing else may be
+/// written to the stream.
 class WaitingLine {
   public:
     /// `doing` says what takes so long.
@@ -42,14 +51,19 @@ class WaitingLine {
     WaitingLine(const WaitingLine&) = delete;
     WaitingLine& operator=(const WaitingLine&) = delete;
 
+    /// Shows the steps that it is told, from any thread. Borrows the line.
+    [[nodiscard]] TellStep steps();
+
   private:
     void run();
+    void showLocked();
 
     std::ostream& terminal_;
     std::size_t room_;
-    std::string doing_;
     std::mutex mutex_;
     std::condition_variable changed_;
+    std::string doing_;
+    unsigned seconds_ = 0;
     bool ended_ = false;
     std::thread thread_;
 };

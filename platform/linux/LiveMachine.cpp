@@ -16,6 +16,7 @@
 #include "tklogger/TKLogger.h"
 #include "zrclient/InstrumentationService.h"
 #include "zrcommon/LogLevel.h"
+#include "zrcommon/PlatformSettings.h"
 #include "zrcommon/SystemName.h"
 #include "zrlinux/LiveSource.h"
 
@@ -113,6 +114,9 @@ LiveMachine::LiveMachine(Surroundings surroundings)
 }
 
 bool LiveMachine::changed() {
+    if (surroundings_.watch == Watch::No) {
+        return readAt_ == 0 || processor_.changed();
+    }
     if (signals_.heard()) {
         monitor_.markChanged();
     }
@@ -178,6 +182,7 @@ std::shared_ptr<const Snapshot> LiveMachine::read() {
     } catch (...) {
         // The monitor has forgotten the changes, and their effect was not read.
         monitor_.markChanged();
+        readAt_ = 0;
         throw;
     }
 }
@@ -186,14 +191,15 @@ std::shared_ptr<const Snapshot> LiveMachine::tryToRead() {
     ClientFacts clients = readClients();
     signals_.follow(clients);
     buses_.consult(clients, surroundings_.uptime());
-    NetworkState network =
-        network_.read(monitor_.takeNetworkChanges(), std::chrono::steady_clock::now() + kernelTime);
+    const bool watches = surroundings_.watch == Watch::Yes;
+    NetworkState network = network_.read(watches ? monitor_.takeNetworkChanges() : NetworkChanges{},
+                                         std::chrono::steady_clock::now() + kernelTime);
     std::move(network.diagnostics.begin(), network.diagnostics.end(),
               std::back_inserter(clients.diagnostics));
     if (!network.certain) {
         monitor_.markChanged();
     }
-    if (surroundings_.realProcesses) {
+    if (surroundings_.realProcesses && watches) {
         watchProcesses(clients);
     }
     markWireless(surroundings_.roots, network.links);
@@ -248,6 +254,12 @@ void LiveMachine::watchProcesses(const ClientFacts& clients) {
 /// Watches first and reads then, until nothing was read that was not watched.
 ClientFacts LiveMachine::readClients() {
     ClientFacts facts;
+    if (surroundings_.watch == Watch::No) {
+        for (const StateReader& reader : stateReaders()) {
+            reader.read(surroundings_.roots, facts);
+        }
+        return facts;
+    }
     for (int round = 0; round < clientRounds; ++round) {
         facts = {};
         monitor_.begin(places_, facts.diagnostics);
@@ -313,12 +325,16 @@ void LiveMachine::report(const std::vector<Diagnostic>& diagnostics) {
 namespace ZR {
 
 void serveLiveMachine() noexcept {
-    InstrumentationService::setMachine([] { return openLiveSource(); });
+    InstrumentationService::setMachine([] {
+        const bool once = PlatformSettings::process().readOnce;
+        return openLiveSource(Explain::No, once ? Watch::No : Watch::Yes);
+    });
 }
 
-std::unique_ptr<SnapshotSource> openLiveSource(Explain explain) {
+std::unique_ptr<SnapshotSource> openLiveSource(Explain explain, Watch watch) {
     Live::Surroundings surroundings;
     surroundings.explain = explain;
+    surroundings.watch = watch;
     return std::make_unique<Live::LiveMachine>(std::move(surroundings));
 }
 

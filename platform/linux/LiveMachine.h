@@ -41,6 +41,7 @@ struct Surroundings {
     IpmiReader::Clock uptime = std::chrono::steady_clock::now;
     ManagerBuses::Ways buses;
     Explain explain = Explain::No;
+    Watch watch = Watch::Yes;
     /// Takes what could not be read, or not for certain.
     std::function<void(std::string_view)> report;
 };

@@ -36,7 +36,7 @@ void readError(const XmlElement& element, OperationResponse& response) {
 
 OperationResponse readResponse(std::string_view body, std::string_view method,
                                std::size_t maximumDepth) {
-    XmlElement cim = readXml(body, maximumDepth);
+    XmlElement cim = readXml(body, maximumDepth, usualMemory(body.size()));
     expectName(cim, "CIM");
     XmlElement& message = onlyChildOf(cim, "MESSAGE");
     XmlElement& simple = onlyChildOf(message, "SIMPLERSP");

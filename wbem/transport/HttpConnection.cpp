@@ -136,7 +136,7 @@ class HttpConnection::Transfer {
     void extend(const Deadline& deadline) { deadline_ = deadline; }
 
   private:
-    enum class Reason { none, memory, bodyTooLong, headersTooLong, interrupted };
+    enum class Reason { none, memory, noRoom, bodyTooLong, headersTooLong, interrupted };
 
     template <typename Value>
     void set(CURLoption option, Value value) {
@@ -161,6 +161,8 @@ class HttpConnection::Transfer {
         return transfer.guarded(size, [&] {
             if (size > transfer.settings_.longestResponse - transfer.response_.body.size()) {
                 transfer.reason_ = Reason::bodyTooLong;
+            } else if (transfer.settings_.mayGrow && !transfer.settings_.mayGrow(size)) {
+                transfer.reason_ = Reason::noRoom;
             } else {
                 transfer.response_.body.append(data, size);
             }
@@ -237,6 +239,8 @@ class HttpConnection::Transfer {
 
     [[nodiscard]] std::string reasonOf(CURLcode code) const {
         switch (reason_) {
+            case Reason::noRoom:
+                return "there was no room for the response in time";
             case Reason::bodyTooLong:
                 return "the response is longer than " + std::to_string(settings_.longestResponse) +
                        " bytes";

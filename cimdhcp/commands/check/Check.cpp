@@ -33,8 +33,8 @@ using Verdict = Finding::Verdict;
 class Examination {
   public:
     Examination(const Options& options, const std::vector<Directories>& installations,
-                std::int64_t now)
-        : options_(options), installations_(installations), now_(now) {}
+                std::int64_t now, const TellStep& tell)
+        : options_(options), installations_(installations), now_(now), tell_(tell) {}
 
     std::vector<Finding> examine() {
         const bool machine = lookAtSettings();
@@ -61,7 +61,8 @@ class Examination {
         std::ostringstream warnings;
         std::optional<Failure> failure;
         try {
-            setUpPlatform(options_, warnings);
+            // Whether the machine can be watched is to be seen, too.
+            setUpPlatform(options_, Look::again, warnings);
         } catch (const Failure& error) {
             failure = error;
         }
@@ -240,7 +241,9 @@ class Examination {
     void lookAtClasses() {
         std::vector<Said> failed;
         std::vector<Said> empty;
+        std::size_t step = 0;
         for (const cimom::Registration& registration : client_->registrations()) {
+            tell_("asking for " + registration.className, ++step, client_->registrations().size());
             if (!registration.instance || registration.nameSpaces.empty()) {
                 continue;
             }
@@ -278,6 +281,7 @@ class Examination {
     const Options& options_;
     const std::vector<Directories>& installations_;
     std::int64_t now_;
+    const TellStep& tell_;
     std::vector<Finding> findings_;
     std::optional<EmbeddedClient> client_;
     std::size_t dhcpInterfaces_ = 0;
@@ -286,8 +290,8 @@ class Examination {
 }  // namespace
 
 std::vector<Finding> check(const Options& options, const std::vector<Directories>& installations,
-                           std::int64_t now) {
-    return Examination(options, installations, now).examine();
+                           std::int64_t now, const TellStep& tell) {
+    return Examination(options, installations, now, tell).examine();
 }
 
 }  // namespace cimdhcp

@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "text/Failure.h"
+#include "text/ProgressBar.h"
 
 namespace cimdhcp {
 
@@ -48,9 +49,9 @@ struct Finding {
 /// Asks an object manager for each class of this project, as its clients do, and tells which
 /// of the responses are wrong, and what that comes from: a library that is not found, a class
 /// without a provider, missing neighbours, the exact provider without its gateway. Of each
-/// class, the first and the last instance are asked for and followed. Throws Failure
-/// when the first request has no response.
-[[nodiscard]] std::vector<Finding> serverFindings(Client& client);
+/// class, the first and the last instance are asked for and followed. Each class is two steps.
+/// Throws Failure when the first request has no response.
+[[nodiscard]] std::vector<Finding> serverFindings(Client& client, const TellStep& tell = untold);
 
 /// Directories whose files shells or network scripts read.
 [[nodiscard]] const std::vector<std::filesystem::path>& sourcedDirectories();

@@ -149,10 +149,13 @@ std::optional<cimom::ObjectPath> pathOfNothing(cimom::ObjectPath path) {
 
 class ServerExamination {
   public:
-    explicit ServerExamination(Client& client) : client_(client) {}
+    ServerExamination(Client& client, const TellStep& tell) : client_(client), tell_(tell) {}
 
     std::vector<Finding> examine() {
+        constexpr std::size_t steps = 2 * servedClasses.size();
+        std::size_t step = 0;
         for (const ServedClass& each : servedClasses) {
+            tell_("asking for " + std::string(each.name), ++step, steps);
             try {
                 enumerate(each);
                 hasResponded_ = true;
@@ -169,6 +172,7 @@ class ServerExamination {
             tellOfNothing();
         } else {
             for (const Served& each : served_) {
+                tell_("following " + std::string(each.served->name), ++step, steps);
                 lookAt(each);
             }
         }
@@ -380,6 +384,7 @@ class ServerExamination {
     }
 
     Client& client_;
+    const TellStep& tell_;
     std::vector<Served> served_;
     std::vector<Wrong> wrong_;  ///< of the class that is looked at
     bool hasResponded_ = false;
@@ -388,8 +393,8 @@ class ServerExamination {
 
 }  // namespace
 
-std::vector<Finding> serverFindings(Client& client) {
-    return ServerExamination(client).examine();
+std::vector<Finding> serverFindings(Client& client, const TellStep& tell) {
+    return ServerExamination(client, tell).examine();
 }
 
 }  // namespace cimdhcp

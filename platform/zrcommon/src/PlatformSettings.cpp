@@ -63,6 +63,11 @@ const char* applySink(std::string_view value, PlatformSettings& settings) {
     return nullptr;
 }
 
+const char* applyReadOnce(std::string_view value, PlatformSettings& settings) {
+    settings.readOnce = value == "yes";
+    return value == "yes" || value == "no" ? nullptr : "not \"yes\" or \"no\"";
+}
+
 const char* applyDataDir(std::string_view value, PlatformSettings& settings) {
     if (value.empty()) {
         setDefault<&PlatformSettings::dataDir>(settings);
@@ -83,7 +88,7 @@ struct Setting {
     Apply apply;
 };
 
-constexpr std::array<Setting, 7> settingTable{{
+constexpr std::array<Setting, 8> settingTable{{
     {"DATA_DIR", "ZR_DATA_DIR", &applyDataDir},
     {"INSTRUMENTATION_TREE", "ZR_INSTRUMENTATION_TREE", &applyTree},
     {"LOG_LEVEL", "ZR_LOG_LEVEL", &applyLevel<&PlatformSettings::logLevel>},
@@ -91,6 +96,7 @@ constexpr std::array<Setting, 7> settingTable{{
     {"LOG_SINK", "ZR_LOG_SINK", &applySink<&PlatformSettings::logSink>},
     {"TRACE_SINK", "ZR_TRACE_SINK", &applySink<&PlatformSettings::traceSink>},
     {"SERVICE_PROCESSOR_WAIT", "ZR_SERVICE_PROCESSOR_WAIT", &applyWait},
+    {"READ_ONCE", "ZR_READ_ONCE", &applyReadOnce},
 }};
 
 std::string quoted(const std::string& text) {

@@ -7,6 +7,7 @@
 
 #include <filesystem>
 
+#include "commands/Exporter.h"
 #include "kit/FileContent.h"
 #include "kit/TemporaryDirectory.h"
 #include "text/Failure.h"
@@ -311,6 +312,118 @@ TEST(ReplaceFile, RefusesWhatIsNotAFile) {
     EXPECT_THROW(replaceFile("/dev/null", "x"), Failure);
     EXPECT_THROW(replaceFile(directory / "none/file", "x"), Failure);
     EXPECT_TRUE(std::filesystem::is_empty(directory.path()));
+}
+
+cimom::wbem::PageRequest probeOf(const std::string& target) {
+    cimom::wbem::PageRequest request;
+    request.path = "/probe";
+    request.arguments = {{"target", target}};
+    return request;
+}
+
+ExporterSettings settingsWith(const std::string& target) {
+    return readExporterSettings(R"({"timeout": 10, "targets": [")" + target + R"("]})", {});
+}
+
+bool isAllowed(const std::string& target, const std::string& asked) {
+    const ExporterSettings settings = settingsWith(target);
+    try {
+        const Probe probe = readProbe(probeOf(asked), settings);
+        return probe.time == std::chrono::seconds(10) && &probe.target == settings.targets[0].get();
+    } catch (const Failure& failure) {
+        EXPECT_STREQ(failure.what(), "the configuration does not allow this target");
+        return false;
+    }
+}
+
+TEST(ProbeTarget, HasSignsForPartsOfOneLevelOfNames) {
+    const std::pair<const char*, const char*> allowed[] = {
+        {"*.example", "a.example"},
+        {"*.example", "HTTPS://A-1.EXAMPLE:5989/cimom"},
+        {"a*b.example", "axb.example"},
+        {"a*b.example", "abbb.example"},
+        {"*a*a.example", "aaaa.example"},
+        {"*-*.example", "a--.example"},
+        {"http://10.0.*.*:1/x", "http://10.0.0.255:1/x"},
+    };
+    for (const auto& [target, asked] : allowed) {
+        EXPECT_TRUE(isAllowed(target, asked)) << target << ' ' << asked;
+    }
+    const std::pair<const char*, const char*> refused[] = {
+        {"*.example", ".example"},
+        {"*.example", "a.b.example"},
+        {"*.example", "a.example."},
+        {"*.example", "a_b.example"},
+        {"*.example", "\xC3\xA4.example"},
+        {"*.example", "\xFF.example"},
+        {"*.example", "*.example"},
+        {"*.example", "a.example:1"},
+        {"*.example", "a.example/x"},
+        {"*.example", "http://a.example"},
+        {"*.example", "a.examplex"},
+        {"a*b.example", "ab.example"},
+        {"*a*a.example", "aa.example"},
+        {"*-*.example", "a-.example"},
+        {"10.0.*.*", "10.0.1"},
+        {"10.0.*.*", "10.0.1.2.3"},
+    };
+    for (const auto& [target, asked] : refused) {
+        EXPECT_FALSE(isAllowed(target, asked)) << target << ' ' << asked;
+    }
+}
+
+TEST(ProbeTarget, IsComparedInNoTimeHoweverManySignsItHas) {
+    std::string signs;
+    for (int number = 0; number < 40; ++number) {
+        signs += "*-";
+    }
+    std::string host;
+    for (int number = 0; number < 120; ++number) {
+        host += "a-";
+    }
+    // Tried one after the other, these would take longer than there has been time.
+    EXPECT_FALSE(isAllowed(signs + "x.example", host + "y.example"));
+    EXPECT_TRUE(isAllowed(signs + "x.example", host + "x.example"));
+}
+
+TEST(Probe, HasTheTimeOfItsScraperLessAnOffset) {
+    const ExporterSettings settings = settingsWith("a.example");
+    const std::pair<const char*, int> times[] = {
+        {"5", 4500},       {"5.0", 4500},  {"0.8", 400},   {"100", 10'000}, {"1e1", 9500},
+        {"", 10'000},      {"0", 10'000},  {"-5", 10'000}, {"nan", 10'000}, {"inf", 10'000},
+        {"1e999", 10'000}, {"5s", 10'000}, {" 5", 10'000}, {"0x5", 10'000}, {"5,5", 10'000},
+        {"86401", 10'000}, {"1e-9", 0},    {"+5", 10'000}, {"5\t", 10'000},
+    };
+    for (const auto& [text, milliseconds] : times) {
+        cimom::wbem::PageRequest request = probeOf("a.example");
+        request.headers = {{"x-prometheus-scrape-timeout-seconds", text}};
+        EXPECT_EQ(readProbe(request, settings).time.count(), milliseconds) << text;
+    }
+    // Two of them are neither the one nor the other.
+    cimom::wbem::PageRequest request = probeOf("a.example");
+    request.headers = {{"X-Prometheus-Scrape-Timeout-Seconds", "1"},
+                       {"X-Prometheus-Scrape-Timeout-Seconds", "2"}};
+    EXPECT_EQ(readProbe(request, settings).time.count(), 10'000);
+}
+
+TEST(Probe, IsOfOneTarget) {
+    const ExporterSettings settings = settingsWith("a.example");
+    cimom::wbem::PageRequest request = probeOf("a.example");
+    for (const auto& arguments :
+         std::vector<cimom::wbem::PageArguments>{{},
+                                                 {{"target", ""}},
+                                                 {{"Target", "a.example"}},
+                                                 {{"target", "a.example"}, {"target", "a.example"}},
+                                                 {{std::string("target\0", 7), "a.example"}},
+                                                 {{"target", std::string("a.example\0", 10)}},
+                                                 {{"target", "a.example\r\nX: y"}},
+                                                 {{"target", "user:word@a.example"}}}) {
+        request.arguments = arguments;
+        EXPECT_THROW(static_cast<void>(readProbe(request, settings)), Failure)
+            << testing::PrintToString(arguments);
+    }
+    request.arguments = {{"module", "x"}, {"target", "a.example"}};
+    EXPECT_EQ(readProbe(request, settings).url.host, "a.example");
 }
 
 }  // namespace

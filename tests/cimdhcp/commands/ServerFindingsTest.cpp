@@ -181,6 +181,18 @@ TEST(ServerFindings, OfAGoodManagerEveryClassIsGood) {
                                      Field(&Finding::detail, "2 instances"))));
 }
 
+TEST(ServerFindings, TellTheirSteps) {
+    Manager manager;
+    std::vector<std::string> steps;
+    static_cast<void>(serverFindings(
+        manager, [&steps](const std::string& doing, std::size_t number, std::size_t total) {
+            steps.push_back(doing + ' ' + std::to_string(number) + '/' + std::to_string(total));
+        }));
+    EXPECT_THAT(steps, SizeIs(30));
+    EXPECT_EQ(steps.front(), "asking for QVXZR_DHCPProtocolEndpoint 1/30");
+    EXPECT_EQ(steps.back(), "following QVXZR_IPAssignmentSettingData 30/30");
+}
+
 TEST(ServerFindings, TellOfClassesThatFailAlikeAtOnce) {
     Manager manager;
     const cimom::Status notLoaded{CMPI_RC_ERR_NOT_FOUND, "Provider not loadable"};

@@ -274,6 +274,21 @@ TEST_F(CheckOfTheLiveMachine, TellsWhatThisUserMayNotRead) {
                                      "      -> run as root"));
 }
 
+TEST_F(CheckOfTheLiveMachine, WatchesIt) {
+    // Where nothing can be watched. A command that asks once does not try to, since the kernel
+    // lets it wait for the end of its watches.
+    const std::string layout =
+        "unshare --user --map-root-user sh -c 'echo 0 >/proc/sys/user/max_inotify_instances; ";
+    const auto run = [&](const std::string& command) {
+        return runAs("/usr/bin/unshare",
+                     {"--net", "/bin/sh", "-c", layout + program() + ' ' + command + "'"});
+    };
+    EXPECT_THAT(run("check").out, HasSubstr("live source: cannot watch files: "));
+    EXPECT_EQ(run("show").err, "");
+    EXPECT_EQ(run("tree").err, "");
+    EXPECT_THAT(run("rename eth0 name").err, HasSubstr("eth0"));
+}
+
 TEST_F(Check, HasAFormForPrograms) {
     const Ended ended = check({"--format", "json"});
     const auto findings = nlohmann::json::parse(ended.out).at("findings");

@@ -11,6 +11,7 @@
 #include "ProgramRun.h"
 #include "ServedProgram.h"
 #include "kit/RawServer.h"
+#include "kit/Sanitizers.h"
 
 namespace {
 
@@ -283,6 +284,48 @@ TEST_F(MetricsProgram, OfTheExporterComeBeforeTheScraperGivesUp) {
     EXPECT_THAT(page, HasSubstr("probe_success 0\n"));
     EXPECT_THAT(page, Not(HasSubstr("dhcp_client")));
     EXPECT_EQ(lint(page), "");
+}
+
+TEST_F(MetricsProgram, OfManyTargetsAtOnceTakeBoundedThreadsAndMemory) {
+    const test::RawServer silent({});
+    constexpr int number = 256;
+    std::string targets;
+    std::string urls;
+    for (int each = 0; each < number; ++each) {
+        const std::string target = silent.url() + "/" + std::to_string(each);
+        targets += (targets.empty() ? "\"" : ", \"") + target + '"';
+        urls += "url = \"URL/probe?target=" + target + "\"\n";
+    }
+    const auto server = start({"serve", "--listen", "127.0.0.1:0"});
+    // One second, for those that wait for their turn, too.
+    const auto exporter =
+        startExporter(R"({"timeout": 1, "targets": [)" + targets + ", \"" + server->url() + "\"]}");
+    for (std::size_t at = 0; (at = urls.find("URL", at)) != std::string::npos;) {
+        urls.replace(at, 3, exporter->url());
+    }
+    ZR::Testing::writeFile(directory() / "urls", urls);
+    const Ended ended =
+        runAs("/usr/bin/curl", {"--silent", "--show-error", "--parallel", "--parallel-immediate",
+                                "--parallel-max", "256", "--config", directory() / "urls"});
+    EXPECT_EQ(ended.status, 0) << ended.err;
+    std::size_t failures = 0;
+    const std::string failure = "\nprobe_success 0\n";
+    for (std::size_t at = 0; (at = ended.out.find(failure, at)) != std::string::npos; ++at) {
+        ++failures;
+    }
+    EXPECT_EQ(failures, number);
+    EXPECT_THAT(pageOf(get(exporter->url() + "/probe?target=" + server->url())),
+                HasSubstr("\nprobe_success 1\n"));
+    const std::string status =
+        ZR::Testing::readFile("/proc/" + std::to_string(exporter->process()) + "/status");
+    const auto value = [&status](const std::string& name) {
+        return std::stoul(status.substr(status.find(name) + name.size()));
+    };
+    // One for each of those that are asked at the same time, and some for the listener.
+    EXPECT_LE(value("\nThreads:"), 80U);
+    if (!ZR::Testing::sanitized) {
+        EXPECT_LT(value("\nVmHWM:"), 65536U) << "KiB";
+    }
 }
 
 TEST_F(MetricsProgram, OfATargetThatSendsGarbageAreAFailure) {

@@ -2,8 +2,10 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <sys/stat.h>
+#include <unistd.h>
 
 #include <algorithm>
+#include <filesystem>
 #include <memory>
 #include <regex>
 
@@ -87,6 +89,20 @@ TEST_F(Remote, EveryClassIsAsOnTheMachineItself) {
     }
     expectSame({"--format", "json", "instances", "CIM_ManagedElement"});
     expectSame({"names", "CIM_Dependency", "--count"});
+}
+
+TEST_F(Remote, ClassesAreDescribedAsOnTheMachineItself) {
+    serve();
+    for (const char* name : {"QVXZR_DHCPSettingData", "QVXZR_DHCPOrderedComponent",
+                             "CIM_DHCPProtocolEndpoint", "QVXZR_DHCPLease"}) {
+        expectSame({"describe", name});
+        expectSame({"--format", "json", "describe", name});
+    }
+    expectSame({"describe", "QVXZR_DHCPLease", "--columns", "property,type"});
+    const Ended unknown = ask({"describe", "QVXZR_DHCPLeas"});
+    EXPECT_EQ(unknown.status, 1);
+    EXPECT_EQ(unknown.out, "");
+    EXPECT_THAT(unknown.err, HasSubstr("QVXZR_DHCPLease"));
 }
 
 TEST_F(Remote, EveryInstanceIsAsOnTheMachineItself) {
@@ -395,6 +411,32 @@ TEST_F(Remote, TlsIsVerified) {
     EXPECT_EQ(ask({"--cacert", missing, "show"}),
               (Ended{3, "", "cimdhcp: " + missing + ": No such file or directory\n"}));
     EXPECT_EQ(ask({"--cacert", tree(), "show"}).status, 3);
+}
+
+TEST_F(Remote, ThoseWhomTheSystemTrustsDoNotVouchBesideAGivenCertificate) {
+    if (::geteuid() != 0) {
+        GTEST_SKIP() << "needs root for a mount namespace";
+    }
+    const std::string other = directory() / "other.pem";
+    std::filesystem::copy_file(certificate("IP:127.0.0.1"), other);
+    const std::string trusted = certificate("IP:127.0.0.1");
+    serve({"--tls-cert", trusted, "--tls-key", directory() / "key.pem"});
+    // Where the system trusts the server's.
+    const auto ask = [&](const std::string& options) {
+        return runAs("/usr/bin/unshare",
+                     {"--mount", "/bin/sh", "-c",
+                      "set -e; mount -t tmpfs none /etc/ssl/certs; cp " + trusted +
+                          " /etc/ssl/certs/ca-certificates.crt; cp " + trusted +
+                          " /etc/ssl/certs/own.pem; ln -s own.pem /etc/ssl/certs/$(openssl x509 "
+                          "-subject_hash -noout -in " +
+                          trusted + ").0; exec " + program() + " --connect " + server_->url() +
+                          options + " show --count"});
+    };
+    EXPECT_EQ(ask(""), (Ended{0, "2\n", ""}));
+    const Ended refused = ask(" --cacert " + other);
+    EXPECT_EQ(refused.status, 3);
+    EXPECT_THAT(refused.err, HasSubstr("its certificate is not to be trusted ("));
+    EXPECT_EQ(ask(" --cacert " + trusted), (Ended{0, "2\n", ""}));
 }
 
 TEST_F(Remote, ACertificateForAnotherNameIsRefused) {

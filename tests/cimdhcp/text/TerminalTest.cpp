@@ -162,10 +162,31 @@ TEST(WaitingLine, SaysHowLongItTakesAndGoesAway) {
     EXPECT_TRUE(terminal.waitFor(0).ends_with("\r\x1B[K"));
 }
 
+TEST(WaitingLine, SaysWhichStepIsBeingDone) {
+    WatchedTerminal terminal;
+    std::ostream out(&terminal);
+    const std::string first = "\r\x1B[Kasking for a, 2 of 3, 1 s";
+    const std::string next = "\r\x1B[Kasking for b, 3 of 3, ";
+    {
+        WaitingLine waiting(out, 40, "reading");
+        const TellStep tell = waiting.steps();
+        tell("asking for a", 2, 3);
+        EXPECT_EQ(terminal.waitFor(first.size()), first);
+        // From now on without a wait.
+        tell("asking for b", 3, 3);
+        EXPECT_THAT(terminal.waitFor(0), testing::HasSubstr(next));
+        tell("drawing", 0, 0);
+        EXPECT_THAT(terminal.waitFor(0), testing::HasSubstr("\r\x1B[Kdrawing, "));
+    }
+}
+
 TEST(WaitingLine, IsForWhatTakesLongOnATerminal) {
     std::ostringstream out;
     { const WaitingLine waiting(out, 40, "reading"); }
-    { const WaitingLine waiting(out, std::nullopt, "reading"); }
+    {
+        WaitingLine waiting(out, std::nullopt, "reading");
+        waiting.steps()("asking", 1, 2);
+    }
     EXPECT_EQ(out.str(), "");
 }
 

@@ -91,8 +91,9 @@ class LiveMachineTest : public testing::Test {
         root_.write("/proc/loadavg", "0.10 0.20 0.30 1/100 17\n");
     }
 
-    LiveMachine& open(std::deque<std::vector<Step>> responses) {
+    LiveMachine& open(std::deque<std::vector<Step>> responses, Watch watch = Watch::Yes) {
         Surroundings surroundings;
+        surroundings.watch = watch;
         std::filesystem::create_directories(root_.path("/proc/thread-self/ns"));
         surroundings.roots = {.files = root_.path(), .proc = root_.path("/proc")};
         surroundings.transport = std::make_unique<ScriptedTransport>(std::move(responses));
@@ -502,6 +503,17 @@ TEST_F(LiveMachineTest, AnAddressThatConnmanGotByDhcp) {
 
 TEST_F(LiveMachineTest, BeforeItIsReadItCountsAsChanged) {
     EXPECT_TRUE(open({}).changed());
+}
+
+TEST_F(LiveMachineTest, UnwatchedItIsWhatItWasAtFirst) {
+    LiveMachine& machine = open({links(1), address(2, {192, 0, 2, 1})}, Watch::No);
+    EXPECT_TRUE(machine.changed());
+    static_cast<void>(machine.read());
+    startClient();
+    now_ += 3600;
+    uptime_ += std::chrono::hours(1);
+    EXPECT_FALSE(machine.changed());
+    EXPECT_THAT(diagnostics_, IsEmpty());
 }
 
 TEST_F(LiveMachineTest, EveryPlaceThatItReadsIsWatched) {

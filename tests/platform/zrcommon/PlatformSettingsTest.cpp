@@ -56,6 +56,7 @@ TEST_F(PlatformSettingsTest, EveryKeyOfTheFileIsTaken) {
     expected.logSink = "stderr";
     expected.traceSink = "file:/srv/trace log";
     expected.serviceProcessorWait = std::chrono::milliseconds(1500);
+    expected.readOnce = true;
     EXPECT_EQ(readContent("# The platform\n"
                           "DATA_DIR = /srv/net/\n"
                           "INSTRUMENTATION_TREE=\"/srv/tree.json\"\n"
@@ -64,7 +65,8 @@ TEST_F(PlatformSettingsTest, EveryKeyOfTheFileIsTaken) {
                           "TRACE_LEVEL=0\n"
                           "LOG_SINK=stderr\n"
                           "TRACE_SINK='file:/srv/trace log'\n"
-                          "SERVICE_PROCESSOR_WAIT=1500\n"),
+                          "SERVICE_PROCESSOR_WAIT=1500\n"
+                          "READ_ONCE=yes\n"),
               expected);
 }
 

@@ -180,6 +180,17 @@ bool isReadable(const std::string& body, const std::string& method) {
     return false;
 }
 
+TEST(OperationResponse, OfElementsThatTakeFarMoreMemoryThanTheirTextIsRefused) {
+    std::string elements;
+    for (int number = 0; number < 50'000; ++number) {
+        elements += "<A/>";
+    }
+    const std::string body =
+        "<CIM><MESSAGE><SIMPLERSP><IMETHODRESPONSE NAME=\"GetInstance\"><IRETURNVALUE>" + elements +
+        "</IRETURNVALUE></IMETHODRESPONSE></SIMPLERSP></MESSAGE></CIM>";
+    EXPECT_THROW(static_cast<void>(readResponse(body, "GetInstance", 64)), XmlError);
+}
+
 TEST(OperationResponse, NoDamageDoesMoreThanMakeItUnreadable) {
     ClassRepository repository;
     repository.loadDirectory(ZR_SOURCE_DIR "/schema");

@@ -116,6 +116,21 @@ TEST(HttpConnection, TakesNoMoreThanTheLimit) {
               "the headers of the response are longer than 65536 bytes");
 }
 
+TEST(HttpConnection, ABodyGrowsOnlyWhereThereIsRoom) {
+    const std::string body(100000, 'x');
+    const ::test::RawServer server({::test::httpResponse(body), ::test::httpResponse(body)});
+    std::size_t grown = 0;
+    HttpSettings settings;
+    settings.mayGrow = [&grown](std::size_t more) {
+        grown += more;
+        return true;
+    };
+    EXPECT_EQ(reason(server.url(), settings), "HTTP 200");
+    EXPECT_EQ(grown, body.size());
+    settings.mayGrow = [](std::size_t /*more*/) { return false; };
+    EXPECT_EQ(reason(server.url(), settings), "there was no room for the response in time");
+}
+
 TEST(HttpConnection, AServerThatSaysNothingIsNotWaitedForBeyondTheDeadline) {
     const ::test::RawServer server({});
     EXPECT_EQ(reason(server.url(), {}, milliseconds(200)), "no response within 1 s");

@@ -14,6 +14,8 @@ namespace {
 
 /// After that, the system may have descriptors or memory again.
 constexpr int pauseMilliseconds = 100;
+/// Then it is looked again whether the thread has to end: clients may come without end.
+constexpr int mostAtOnce = 64;
 
 ZR::UniqueFd newEvent() {
     ZR::UniqueFd event(::eventfd(0, EFD_CLOEXEC));
@@ -54,12 +56,12 @@ void Acceptor::run() {
         if (count > 0 && ready[0].revents != 0) {
             return;
         }
-        resting = !takeAll();
+        resting = !takeSome();
     }
 }
 
-bool Acceptor::takeAll() {
-    for (;;) {
+bool Acceptor::takeSome() {
+    for (int count = 0; count < mostAtOnce; ++count) {
         sockaddr_storage client{};
         socklen_t length = sizeof client;
         const int taken = ::accept4(socket_.get(), reinterpret_cast<sockaddr*>(&client), &length,
@@ -70,6 +72,7 @@ bool Acceptor::takeAll() {
             return errno == EAGAIN;
         }
     }
+    return true;
 }
 
 }  // namespace cimom::wbem

@@ -27,8 +27,8 @@ class Acceptor {
 
   private:
     void run();
-    /// Takes all who wait; false when the system lacks what a connection needs.
-    bool takeAll();
+    /// Takes those who wait, or many of them; false when the system lacks what a connection needs.
+    bool takeSome();
 
     const ListeningSocket socket_;
     const Take take_;

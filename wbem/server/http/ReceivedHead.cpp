@@ -21,12 +21,13 @@ bool libraryRefuses() noexcept {
 /// without a name, and tells none of it. It hands out pointers into the bytes as they have
 /// arrived, decrypted, with null bytes over the ends of lines. So there are two null bytes
 /// from the end of one text to the beginning of the next one if the line has ended as it has
-/// to, and four behind the last one. A line that continues the one before is copied
-/// elsewhere, and fails the same way: RFC 9112, 5.2, has it refused. What cannot be seen stands
-/// at the very end: a header with neither name nor value, behind which the library takes the
-/// rest for the body, and null bytes at the end of the last value.
+/// to, and four from the last one to the end of the head, whose length the library tells. A line
+/// that continues the one before is copied elsewhere, and fails the same way: RFC 9112, 5.2, has
+/// it refused. What cannot be seen is a null byte in place of the carriage return before a line
+/// feed.
 class LineEnds {
   public:
+    /// `version` is the last text of the request line.
     explicit LineEnds(const char* version)
         : visible_(!libraryRefuses()), end_(version + std::strlen(version)) {}
 
@@ -36,11 +37,12 @@ class LineEnds {
         end_ = value + std::strlen(value);
     }
 
-    [[nodiscard]] bool right() const {
-        // The last header and the empty line behind it. The library has read at least two
-        // bytes there, and its memory of a connection goes on for longer than a head may be.
+    /// Whether the head ends as it has to, too; it goes from `begin` for `size` bytes.
+    [[nodiscard]] bool right(const char* begin, std::size_t size) const {
+        // The end of the last line, and the empty line behind it.
         constexpr std::size_t headEnd = 4;
-        return !visible_ || (right_ && std::memcmp(end_, "\0\0\0\0", headEnd) == 0);
+        return !visible_ || (right_ && addressOf(end_) + headEnd == addressOf(begin) + size &&
+                             std::memcmp(end_, "\0\0\0\0", headEnd) == 0);
     }
 
   private:
@@ -81,7 +83,9 @@ HttpHead receivedHead(MHD_Connection* connection, const char* target, const char
     LineEnds ends(version);
     Reading reading{head, ends};
     MHD_get_connection_values(connection, MHD_HEADER_KIND, addHeader, &reading);
-    head.ambiguous = head.ambiguous || !ends.right();
+    const MHD_ConnectionInfo* const size =
+        MHD_get_connection_info(connection, MHD_CONNECTION_INFO_REQUEST_HEADER_SIZE);
+    head.ambiguous = head.ambiguous || size == nullptr || !ends.right(method, size->header_size);
     // A query would have been taken off the target.
     if (MHD_get_connection_values(connection, MHD_GET_ARGUMENT_KIND, nullptr, nullptr) > 0) {
         head.target += '?';

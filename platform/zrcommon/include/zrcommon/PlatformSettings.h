@@ -28,6 +28,9 @@ struct PlatformSettings {
     /// SERVICE_PROCESSOR_WAIT: how long the first reading of a process may wait for what a
     /// service processor responds.
     std::chrono::milliseconds serviceProcessorWait{0};
+    /// READ_ONCE: the live machine is what it was at the first request of the process, and is
+    /// not watched for changes.
+    bool readOnce = false;
 
     /// What could not be used, one text each with its file and line or its
     /// variable; the setting then has its default.

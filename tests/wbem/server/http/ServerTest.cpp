@@ -212,8 +212,15 @@ TEST_F(WbemServer, RefusesHeadsThatOthersCouldReadDifferently) {
         EXPECT_TRUE(client.waitForEnd());
     }
     // The line of the request, and the end of the head.
-    for (const auto& [right, wrong] : std::vector<std::pair<std::string, std::string>>{
-             {"HTTP/1.1\r\n", "HTTP/1.1\n"}, {"\r\n\r\n", "\r\n\n"}, {"\r\n\r\n", "\n\n"}}) {
+    for (const auto& [right, wrong] :
+         std::vector<std::pair<std::string, std::string>>{{"HTTP/1.1\r\n", "HTTP/1.1\n"},
+                                                          {"\r\n\r\n", "\r\n\n"},
+                                                          {"\r\n\r\n", "\n\n"},
+                                                          {"\r\n\r\n", "\r\n:\r\n\r\n"},
+                                                          {"\r\n\r\n", "\r\n:\r\n:\r\n\r\n"},
+                                                          {"\r\n\r\n", "\0\r\n\r\n"s},
+                                                          {"\r\n\r\n", "\0\0\0\0\r\n\r\n"s},
+                                                          {"\r\n\r\n", "\r\n\0\r\n\r\n"s}}) {
         std::string request = good;
         request.replace(request.find(right), right.size(), wrong);
         EXPECT_EQ(server.ask(request).status, 400U) << testing::PrintToString(wrong);

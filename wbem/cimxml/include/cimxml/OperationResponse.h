@@ -20,8 +20,8 @@ struct OperationResponse {
 };
 
 /// Reads the response to an operation of that name (DSP0201, 5.6). Versions and the
-/// message's ID may be any, since servers disagree about them. Throws XmlError, and
-/// NotValid for anything that is not such a response.
+/// message's ID may be any, since servers disagree about them. Throws XmlError, also for one that
+/// takes more than usualMemory(), and NotValid for anything that is not such a response.
 [[nodiscard]] OperationResponse readResponse(std::string_view body, std::string_view method,
                                              std::size_t maximumDepth);
 

@@ -3,6 +3,7 @@
 #include <atomic>
 #include <chrono>
 #include <cstddef>
+#include <functional>
 #include <memory>
 #include <optional>
 #include <stdexcept>
@@ -32,6 +33,9 @@ struct HttpSettings {
     /// one which is busy may take.
     std::chrono::milliseconds connectPatience{5000};
     std::size_t longestResponse = 16U << 20U;  ///< bytes of the body
+    /// Asked before a body grows by so many bytes, in the thread of the request; false ends the
+    /// request. May wait. None: it always grows.
+    std::function<bool(std::size_t more)> mayGrow{};
     /// Requests end soon after it has become true. Borrowed; null: nothing does that.
     const std::atomic<bool>* interrupted = nullptr;
 };
