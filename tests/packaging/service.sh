@@ -14,14 +14,15 @@ server=
 
 unit=$directory/cimdhcp.service
 sed -e "s|@CMAKE_INSTALL_PREFIX@/@BINDIR@|$build/bin|" "$template" > "$unit"
+# The manual page that units name is there where they are installed.
 if command -v systemd-analyze > /dev/null; then
-    systemd-analyze verify "$unit" 2> "$directory/complaints" || true
+    systemd-analyze verify --man=no "$unit" 2> "$directory/complaints" || true
     # Of its neighbours, as they would be installed beside it.
     for further in cimdhcp-metrics.service cimdhcp-metrics.timer cimdhcp-exporter.service; do
         source=${template%/*}/$further
         test -e "$source" || source=$source.in
         sed -e "s|@CMAKE_INSTALL_PREFIX@/@BINDIR@|$build/bin|" "$source" > "$directory/$further"
-        systemd-analyze verify "$directory/$further" 2>> "$directory/complaints" || true
+        systemd-analyze verify --man=no "$directory/$further" 2>> "$directory/complaints" || true
     done
     # Other units of the machine are none of ours.
     if grep -F cimdhcp "$directory/complaints"; then
