@@ -4,37 +4,20 @@
   docs/figures/dashboard.py answers.json docs/figures/dashboard.svg
 """
 
-import html
 import json
 import sys
 
+from drawing import Drawing
+
 WIDTH, ROW = 960, 22
-COLORS = {"bound": "#4d8a3c", "renewing": "#86b36f", "rebinding": "#b08030", "asking": "#c06030",
+STATES = {"bound": "#4d8a3c", "renewing": "#86b36f", "rebinding": "#b08030", "asking": "#c06030",
           "expired": "#a03030", "no_link": "#777777", "off": "#bbbbbb", "unknown": "#7050a0"}
 
 
-class Drawing:
-    def __init__(self):
-        self.lines = []
-
-    def text(self, x, y, words, size=12, color="#222222", anchor="start", weight="normal"):
-        self.lines.append(f'<text x="{x}" y="{y}" font-size="{size}" fill="{color}" '
-                          f'text-anchor="{anchor}" font-weight="{weight}">'
-                          f'{html.escape(str(words))}</text>')
-
-    def box(self, x, y, width, height, color, stroke="none"):
-        self.lines.append(f'<rect x="{x}" y="{y}" width="{width:.1f}" height="{height}" rx="3" '
-                          f'fill="{color}" stroke="{stroke}"/>')
-
+class Panels(Drawing):
     def panel(self, x, y, width, height, title):
         self.box(x, y, width, height, "#ffffff", "#cccccc")
-        self.text(x + 10, y + 18, title, weight="bold")
-
-    def svg(self, height):
-        return "\n".join([f'<svg xmlns="http://www.w3.org/2000/svg" viewBox="0 0 {WIDTH} {height}" '
-                          'font-family="Helvetica, Arial, sans-serif">',
-                          f'<rect width="{WIDTH}" height="{height}" fill="#f4f4f0"/>',
-                          *self.lines, "</svg>", ""])
+        self.text(x + 10, y + 18, title, bold=True)
 
 
 def number(result):
@@ -60,18 +43,18 @@ def bars(drawing, x, y, width, rows):
 
 
 def draw(answers):
-    drawing = Drawing()
+    drawing = Panels()
     leases = sum(number(each) for each in answers["Leases"][0])
     tiles = [("Machines", f"{number(answers['Machines'][0][0]):.0f}", "#3050a0"),
              ("Silent machines", f"{number(answers['Silent machines'][0][0]):.0f}", "#4d8a3c"),
              ("Leases", f"{leases:.0f}", "#3050a0"),
              ("Next lease to end", duration(number(answers["Next lease to end"][0][0])), "#b08030")]
     for index, (title, words, color) in enumerate(tiles):
-        x = 10 + index * 237
-        drawing.panel(x, 10, 227, 80, title)
-        drawing.text(x + 113, 70, words, size=34, color=color, anchor="middle", weight="bold")
+        x = 10 + index * 237.5
+        drawing.panel(x, 10, 227.5, 80, title)
+        drawing.text(x + 113, 70, words, size=34, color=color, anchor="middle", bold=True)
     states = {each["metric"]["state"]: number(each) for each in answers["Clients by state"][0]}
-    shown = [(state, states.get(state, 0), color) for state, color in COLORS.items()]
+    shown = [(state, states.get(state, 0), color) for state, color in STATES.items()]
     drawing.panel(10, 100, 464, 215, "Clients by state")
     bars(drawing, 10, 130, 464, shown)
     names = ["below 5 min", "below 1 h", "below 1 d", "longer"]
@@ -87,7 +70,7 @@ def draw(answers):
             top = 365 + index * ROW
             drawing.text(x + 20, top, each["metric"].get(label, "not known"))
             drawing.text(x + 440, top, f"{number(each):.0f}", anchor="end")
-    return drawing.svg(460)
+    return drawing.svg(WIDTH, 460, "#f4f4f0")
 
 
 if __name__ == "__main__":
