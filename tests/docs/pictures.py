@@ -107,7 +107,7 @@ def expect(what, found, wanted):
 
 
 def check_the_check():
-    """Pictures with one fault each, and the most that bench/run draws, which has none."""
+    """Pictures with one fault each, and the most that the tools draw, which has none."""
     def picture(texts, ground="white"):
         return (f'<svg xmlns="http://www.w3.org/2000/svg" viewBox="0 0 100 100">'
                 f'<rect width="100" height="100" fill="{ground}"/>'
@@ -127,12 +127,15 @@ def check_the_check():
              for each in range(14)]
     curves = {name: {1: 1e3, 10: 2e6, 12: 3e6, 10000: 9e9} for name in names}
     expect("many curves", problems(plot(curves, "Many", "interfaces")), [])
+    samples = [{"requests": each, "residentKiB": 90 * each, "descriptors": 7} for each in (1, 999999)]
+    expect("a process that grows", problems(soak.draw(samples)), [])
     expect("few curves", problems(plot({name[-2:]: curves[name] for name in names}, "Few", "clients")), [])
 
 
 if __name__ == "__main__":
     docs = pathlib.Path(sys.argv[1]) / "docs"
     sys.path.insert(0, str(docs / "figures"))
+    import soak
     from drawing import plot, text_width
 
     check_the_check()

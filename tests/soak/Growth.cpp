@@ -7,7 +7,6 @@
 #include <filesystem>
 #include <fstream>
 #include <iterator>
-#include <sstream>
 #include <stdexcept>
 
 namespace test {
@@ -35,45 +34,6 @@ std::string growthOf(const std::vector<Sample>& samples, Quantity quantity, cons
     }
     return std::string(what) + " grew from " + std::to_string(before) + " to " +
            std::to_string(after) + '\n';
-}
-
-/// The drawing's plane, in its own units.
-constexpr double left = 80;
-constexpr double right = 720;
-constexpr double top = 50;
-constexpr double bottom = 340;
-
-std::string polyline(const std::vector<Sample>& samples, Quantity quantity, std::uint64_t highest,
-                     const char* colour) {
-    std::ostringstream out;
-    out << "<polyline fill=\"none\" stroke-width=\"1.5\" stroke=\"" << colour << "\" points=\"";
-    const double last = static_cast<double>(std::max<std::uint64_t>(samples.back().requests, 1));
-    for (const Sample& sample : samples) {
-        const double x = left + (right - left) * static_cast<double>(sample.requests) / last;
-        const double y = bottom - (bottom - top) * static_cast<double>(sample.*quantity) /
-                                      static_cast<double>(highest);
-        out << x << ',' << y << ' ';
-    }
-    out << "\"/>\n";
-    return out.str();
-}
-
-std::string text(double x, double y, const char* anchor, const char* colour,
-                 const std::string& content) {
-    std::ostringstream out;
-    out << "<text x=\"" << x << "\" y=\"" << y << "\" text-anchor=\"" << anchor << "\" fill=\""
-        << colour << "\">" << content << "</text>\n";
-    return out.str();
-}
-
-/// A round number above all values, so that a line is not at the edge.
-std::uint64_t ceiling(const std::vector<Sample>& samples, Quantity quantity) {
-    const std::uint64_t highest = std::max<std::uint64_t>(most(samples, quantity, 0, 10), 1);
-    std::uint64_t step = 1;
-    while (step * 10 <= highest) {
-        step *= 10;
-    }
-    return (highest / step + 1) * step;
 }
 
 }  // namespace
@@ -107,34 +67,6 @@ std::string toJson(const std::vector<Sample>& samples) {
         separator = ",\n";
     }
     return json + "\n]\n";
-}
-
-std::string toSvg(const std::vector<Sample>& samples) {
-    constexpr const char* black = "#222222";
-    constexpr const char* blue = "#1f5fa8";
-    constexpr const char* orange = "#b85c00";
-    const std::uint64_t memory = ceiling(samples, &Sample::residentKiB);
-    const std::uint64_t descriptors = ceiling(samples, &Sample::descriptors);
-    std::ostringstream out;
-    out << "<svg xmlns=\"http://www.w3.org/2000/svg\" viewBox=\"0 0 800 400\" "
-           "font-family=\"sans-serif\" font-size=\"13\">\n"
-        << "<rect width=\"800\" height=\"400\" fill=\"white\"/>\n"
-        << "<path d=\"M" << left << ' ' << top << " V" << bottom << " H" << right << " V" << top
-        << "\" fill=\"none\" stroke=\"" << black << "\"/>\n"
-        << text(left, 30, "start", blue, "resident memory, KiB")
-        << text(right, 30, "end", orange, "open descriptors")
-        << text((left + right) / 2, 385, "middle", black, "requests");
-    for (std::uint64_t quarter = 0; quarter <= 4; ++quarter) {
-        const double share = static_cast<double>(quarter) / 4;
-        const double y = bottom - (bottom - top) * share;
-        out << text(left - 8, y + 4, "end", blue, std::to_string(memory * quarter / 4))
-            << text(right + 8, y + 4, "start", orange, std::to_string(descriptors * quarter / 4))
-            << text(left + (right - left) * share, bottom + 20, "middle", black,
-                    std::to_string(samples.back().requests * quarter / 4));
-    }
-    out << polyline(samples, &Sample::residentKiB, memory, blue)
-        << polyline(samples, &Sample::descriptors, descriptors, orange) << "</svg>\n";
-    return out.str();
 }
 
 }  // namespace test

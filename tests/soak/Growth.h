@@ -28,8 +28,7 @@ struct Bounds {
 /// first half is for what is made once and kept.
 [[nodiscard]] std::string growth(const std::vector<Sample>& samples, const Bounds& bounds);
 
-/// The samples as a JSON document, and drawn: memory and descriptors over requests.
+/// The samples as a JSON document, which docs/figures/soak.py draws.
 [[nodiscard]] std::string toJson(const std::vector<Sample>& samples);
-[[nodiscard]] std::string toSvg(const std::vector<Sample>& samples);
 
 }  // namespace test

@@ -120,7 +120,7 @@ class Soak {
 int soak(const std::vector<std::string>& arguments) {
     if (arguments.size() != 2) {
         std::cerr << "usage: soak REQUESTS DIRECTORY\n"
-                     "Writes DIRECTORY/soak.json and DIRECTORY/soak.svg.\n";
+                     "Writes DIRECTORY/soak.json.\n";
         return 2;
     }
     const std::uint64_t requests = std::stoull(arguments[0]);
@@ -134,7 +134,6 @@ int soak(const std::vector<std::string>& arguments) {
     }
     const std::vector<Sample> samples = Soak(withLinks).run(requests);
     ZR::Testing::writeFile(arguments[1] + "/soak.json", test::toJson(samples));
-    ZR::Testing::writeFile(arguments[1] + "/soak.svg", test::toSvg(samples));
     test::Bounds bounds;
 #if defined(ZR_SANITIZERS)
     bounds.residentKiB = UINT64_MAX / 2;  // a sanitizer keeps what was freed
