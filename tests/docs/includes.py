@@ -14,7 +14,7 @@ import pathlib
 import re
 import sys
 
-from arrows import read_arrows
+from rooms import read_arrows
 
 # The folders of a room, lowest first; folders of one level may include each other's files.
 # A header of the room's include/ stands as high as the folder of its source, or, if it has

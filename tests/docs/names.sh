@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
-# Every file that a page names, and every link to another page, is there. Of the pages
-# that say how the tree is changed, every name of the code is, too. And every folder is
-# told of in docs/architecture.md.
+# Every file that a page names, and every link to a page and its part, is there, and README.md has
+# a link to each page. Of the pages that say how the tree is changed, every name of the code is
+# there, too. And every folder is told of in docs/architecture.md.
 # Usage: names.sh SOURCE_DIRECTORY
 set -euo pipefail
 cd "$1"
@@ -17,6 +17,9 @@ for file in "${tree[@]}"; do
     names[${file##*/}]=1
     tops[${file%%/*}]=1
 done
+headings() { # of a page, as links name them
+    sed -nE 's/^#+ //p' "$1" | tr '[:upper:]' '[:lower:]' | sed -E 's/[^a-z0-9 _-]//g; s/ /-/g'
+}
 in_tree() { # a path of the tree, with wildcards; words such as TARGET stand for any
     local path
     path=$(sed -E 's/TARGET|NAME|WHY/*/g' <<<"$1")
@@ -26,8 +29,12 @@ in_tree() { # a path of the tree, with wildcards; words such as TARGET stand for
 pages=(*.md docs/*.md)
 for page in "${pages[@]}"; do
     while read -r link; do
-        [[ $link == *://* || $link == '#'* ]] && continue
-        [[ -e ${page%"${page##*/}"}${link%%#*} ]] || missing "$page" "$link"
+        [[ $link == *://* ]] && continue
+        target=${page%"${page##*/}"}${link%%#*}
+        [[ $link != '#'* ]] || target=$page
+        if [[ ! -e $target ]] || { [[ $link == *'#'* ]] && ! headings "$target" | grep -qxF "${link#*#}"; }; then
+            missing "$page" "$link"
+        fi
     done < <(grep -oP '\]\(\K[^)]+' "$page" || true)
     while read -r name; do
         if [[ $name == */* ]]; then
@@ -38,6 +45,11 @@ for page in "${pages[@]}"; do
             [[ -n ${names[$name]:-} || -n ${names[$name.in]:-} ]] || missing "$page" "$name"
         fi
     done < <(grep -oP '`\K[A-Za-z0-9_][A-Za-z0-9_.*/-]*(?=`)' "$page" || true)
+done
+
+# A reader of README.md finds each page.
+for page in docs/*.md; do
+    grep -qF "($page)" README.md || missing README.md "link to $page"
 done
 
 # Names of the code: functions, types, members, CMake's variables.

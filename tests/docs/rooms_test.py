@@ -12,7 +12,7 @@ import unittest
 
 import includes
 import rooms
-from arrows import Arrows, read_arrows
+from rooms import Arrows, read_arrows
 
 ARROWS, DRAWING = (pathlib.Path(argument) for argument in sys.argv[1:])
 

@@ -9,6 +9,10 @@
 # a line "..." stands for any lines. A command without output shown may print what it
 # likes and has to succeed. A block without "$" is a script that has to succeed.
 #
+# Every other block says what it is, where the reader does not see it: commands that cannot
+# be run here are fenced as "sh not run: REASON", and "console" is run by another test; texts
+# have the name of their language. How many blocks are not run, and why, is printed.
+#
 # Usage: run-page.sh PAGE BUILD_DIRECTORY SOURCE_DIRECTORY
 set -euo pipefail
 
@@ -20,17 +24,42 @@ trap 'rm -rf "$directory"' EXIT
 
 # Each command is a file N.command, and N.expected if output is shown.
 number=0
+faults=0
 inside=no
+before=
+unrun=()
 begin() {
     number=$((number + 1))
     printf '%s\n' "$1" >"$directory/$number.command"
 }
+fault() { # WHAT
+    echo "$page: $1"
+    faults=$((faults + 1))
+}
+fence() { # the words behind ```
+    inside=other
+    case $1 in
+        sh) inside=first ;;
+        "sh not run: "?*) unrun+=("${1#sh not run: }") ;;
+        console) [[ $page == */fleet.md ]] || fault "console blocks are run for docs/fleet.md alone" ;;
+        text | cmake | cpp | ini | json | sql | yaml) ;;
+        *) fault "this block does not say what it is: \`\`\`$1" ;;
+    esac
+}
 while IFS= read -r line; do
     case $inside in
-        no) if [[ $line == '```sh' ]]; then inside=first; fi ;;
+        no)
+            if [[ $line == '```'* ]]; then
+                fence "${line#'```'}"
+            elif [[ $line == '    '* && -z $before ]]; then
+                fault "this block is not fenced: $line"
+            fi
+            ;;
         *)
             if [[ $line == '```' ]]; then
                 inside=no
+            elif [[ $inside == other ]]; then
+                :
             elif [[ $inside == continued ]]; then
                 printf '%s\n' "$line" >>"$directory/$number.command"
                 [[ $line == *\\ ]] || inside=output
@@ -47,11 +76,13 @@ while IFS= read -r line; do
             fi
             ;;
     esac
+    before=$line
 done <"$page"
-if ((number == 0)); then
-    echo "$page: no block that can be run" >&2
-    exit 1
-fi
+[[ $inside == no ]] || fault "a block has no end"
+echo "$page: $number commands and scripts are run, ${#unrun[@]} blocks are not"
+((${#unrun[@]} == 0)) || printf '  not run: %s\n' "${unrun[@]}" | sort | uniq -c
+((faults == 0)) || exit 1
+((number > 0)) || exit 0
 
 # Compares a file of output with the expected one.
 cat >"$directory/agrees.awk" <<'TEXT'
@@ -72,7 +103,7 @@ END {
 TEXT
 
 cat >"$directory/inside" <<'TEXT'
-export HOME=/root PATH=/usr/sbin:/usr/bin:/sbin:/bin
+export HOME=/root MACHINES=3 PATH=/usr/sbin:/usr/bin:/sbin:/bin
 cd /dhcp-client-provider
 failures=0
 for ((number = 1; number <= $1; ++number)); do
@@ -111,12 +142,16 @@ mount --bind /dev "$root/dev"
 # What an installation on the machine itself may have left.
 rm -rf "$root/etc/zr" "$root/var/lib/dhcp-client-provider" "$root/var/lib/sfcb"
 mount -t tmpfs none "$root/run"
+mount -t tmpfs none "$root/tmp"
 mkdir -p "$root/run/page" "$root/dhcp-client-provider"
 for component in gateway provider neighbours schema cimdhcp; do
     DESTDIR=$root cmake --install "$build" --component "$component" --prefix /usr >/dev/null
 done
 cp "$directory"/*.* "$directory/inside" "$root/run/page"
-cp -r "$source/docs" "$root/dhcp-client-provider"
+cp -r "$source"/{docs,fuzz} "$root/dhcp-client-provider"
+# What scripts/run leaves, where it leaves it.
+mkdir -p "$root/dhcp-client-provider/build/run/bin"
+ln -s /usr/bin/cimdhcp "$root/dhcp-client-provider/build/run/bin/cimdhcp"
 hostname example
 ip link set lo up
 exec chroot "$root" /bin/bash /run/page/inside "$number"

@@ -150,9 +150,9 @@ TEST_F(UdhcpcTest, AFileThatOthersMayWriteIsNotBelieved) {
 
 TEST_F(UdhcpcTest, TheScriptOfTheDocumentsWritesIt) {
     const std::string page = File::read(ZR_SOURCE_DIR "/docs/sources.md").value();
-    const std::size_t start = page.find("    case $1 in\n", page.find("## Helping udhcpc"));
+    const std::size_t start = page.find("case $1 in\n", page.find("## Helping udhcpc"));
     ASSERT_NE(start, std::string::npos);
-    std::string script = page.substr(start, page.find("    esac\n", start) + 9 - start);
+    std::string script = page.substr(start, page.find("esac\n", start) + 5 - start);
     for (std::size_t at = 0; (at = script.find("\"/run/", at)) != std::string::npos; ++at) {
         script.insert(at + 1, root_.path(""));
     }
