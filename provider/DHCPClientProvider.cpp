@@ -78,7 +78,8 @@ constexpr std::array servedClasses{
 template <typename Operation>
 CMPIStatus serve(const TracePoint& at, const CMPIObjectPath* path, Operation operation) {
     const OneMoment moment;
-    markProviderEntry(loggerDHCPClientProvider, at.source.file.data(), at.function.data(), at.line.number());
+    markProviderEntry(loggerDHCPClientProvider, at.source.file.data(), at.function.data(),
+                      at.line.number());
     const unsigned short classId = ProviderUtilities::getClassId(path);
     traceVariable(at, "classId", classId);
     CMPIStatus status{CMPI_RC_OK, nullptr};
@@ -87,7 +88,8 @@ CMPIStatus serve(const TracePoint& at, const CMPIObjectPath* path, Operation ope
     } catch (const std::exception& exception) {
         traceMessage(at, exception.what());
     }
-    markProviderExit(loggerDHCPClientProvider, at.source.file.data(), at.function.data(), at.line.number());
+    markProviderExit(loggerDHCPClientProvider, at.source.file.data(), at.function.data(),
+                     at.line.number());
     return status;
 }
 
@@ -216,7 +218,8 @@ CMPIStatus serveAssociators(const Request& request, const char* assocClass, cons
                             AssociatorColumn column, bool names) {
     const OneMoment moment;
     const TracePoint& at = request.at;
-    markProviderEntry(loggerDHCPClientProvider, at.source.file.data(), at.function.data(), at.line.number());
+    markProviderEntry(loggerDHCPClientProvider, at.source.file.data(), at.function.data(),
+                      at.line.number());
     CMPIStatus status{CMPI_RC_OK, nullptr};
     bool served = true;
     const auto guarded = [&](const auto& step) {
@@ -256,7 +259,8 @@ CMPIStatus serveAssociators(const Request& request, const char* assocClass, cons
     if (served) {
         request.result->ft->returnDone(request.result);
     }
-    markProviderExit(loggerDHCPClientProvider, at.source.file.data(), at.function.data(), at.line.number());
+    markProviderExit(loggerDHCPClientProvider, at.source.file.data(), at.function.data(),
+                     at.line.number());
     return status;
 }
 
@@ -265,7 +269,8 @@ CMPIStatus serveReferences(const Request& request, const char* resultClass, Refe
                            bool names) {
     const OneMoment moment;
     const TracePoint& at = request.at;
-    markProviderEntry(loggerDHCPClientProvider, at.source.file.data(), at.function.data(), at.line.number());
+    markProviderEntry(loggerDHCPClientProvider, at.source.file.data(), at.function.data(),
+                      at.line.number());
     const unsigned short classId = ProviderUtilities::getClassId(resultClass);
     traceVariable(at, "classId", classId);
     CMPIStatus status{CMPI_RC_OK, nullptr};
@@ -281,7 +286,8 @@ CMPIStatus serveReferences(const Request& request, const char* resultClass, Refe
     } else {
         status.rc = CMPI_RC_ERR_INVALID_CLASS;
     }
-    markProviderExit(loggerDHCPClientProvider, at.source.file.data(), at.function.data(), at.line.number());
+    markProviderExit(loggerDHCPClientProvider, at.source.file.data(), at.function.data(),
+                     at.line.number());
     return status;
 }
 
