@@ -4,7 +4,7 @@
 #include <iostream>
 
 #include "commands/Program.h"
-#include "text/Terminal.h"
+#include "text/DisplayText.h"
 
 int main(int argc, char** argv) {
     const std::vector<std::string> arguments(argv + (argc > 0 ? 1 : 0), argv + argc);

@@ -26,7 +26,6 @@
 #include "commands/PlatformSetup.h"
 #include "commands/Serve.h"
 #include "commands/ServerAccess.h"
-#include "commands/UserAdd.h"
 #include "commands/Watch.h"
 #include "commands/check/Check.h"
 #include "commands/check/Findings.h"

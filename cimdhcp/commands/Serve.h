@@ -45,4 +45,9 @@ void renewListeners(const ServeCommand& command, const std::vector<cimom::wbem::
 void serve(const ServeCommand& command, cimom::ObjectManager& manager, AskMetrics ask,
            std::ostream& out);
 
+/// Adds a user to the server's users file, or changes role and password. On a
+/// terminal the password is asked for twice on `prompts`, without an echo; otherwise
+/// it is the first line of standard input. Throws Failure.
+void addUser(const UserAddCommand& command, std::ostream& out, std::ostream& prompts);
+
 }  // namespace cimdhcp

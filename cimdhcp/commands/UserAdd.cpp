@@ -1,4 +1,4 @@
-#include "commands/UserAdd.h"
+#include "commands/Serve.h"
 
 #include <termios.h>
 #include <unistd.h>

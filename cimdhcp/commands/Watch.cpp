@@ -32,7 +32,6 @@
 #include "commands/WatchSubscriptions.h"
 #include "text/DisplayText.h"
 #include "text/Failure.h"
-#include "text/Terminal.h"
 #include "text/Times.h"
 #include "zrcommon/UniqueFd.h"
 

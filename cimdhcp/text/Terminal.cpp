@@ -1,4 +1,4 @@
-#include "text/Terminal.h"
+#include "text/DisplayText.h"
 
 #include <langinfo.h>
 #include <sys/ioctl.h>

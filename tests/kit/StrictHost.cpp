@@ -10,7 +10,6 @@
 
 #include "cimom/Names.h"
 #include "kit/StrictObjects.h"
-#include "kit/StrictValues.h"
 
 namespace strict {
 

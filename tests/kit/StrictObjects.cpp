@@ -2,7 +2,6 @@
 
 #include "cimom/ClassDeclaration.h"
 #include "cimom/ObjectPathText.h"
-#include "kit/StrictValues.h"
 
 namespace strict {
 

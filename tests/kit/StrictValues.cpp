@@ -1,4 +1,4 @@
-#include "kit/StrictValues.h"
+#include "kit/StrictObjects.h"
 
 #include <algorithm>
 #include <memory>
@@ -8,7 +8,6 @@
 #include "cimom/Instance.h"
 #include "cimom/Names.h"
 #include "cimom/ObjectPathText.h"
-#include "kit/StrictObjects.h"
 
 namespace strict {
 

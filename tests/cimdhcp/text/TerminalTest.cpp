@@ -13,7 +13,7 @@
 
 #include "text/ProgressBar.h"
 #include "text/Style.h"
-#include "text/Terminal.h"
+#include "text/DisplayText.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace cimdhcp {
