@@ -20,11 +20,12 @@ const cimom::Array* elementsOf(const cimom::Qualifier* qualifier) {
     return qualifier == nullptr ? nullptr : qualifier->value.array();
 }
 
-std::optional<std::string> textAt(const cimom::Array& elements, std::size_t index) {
+/// Of any index: a value of a property may be one.
+std::optional<std::string> textAt(const cimom::Array& elements, std::uint64_t index) {
     if (index >= elements.size()) {
         return std::nullopt;
     }
-    const auto* const text = std::get_if<std::string>(&elements[index]);
+    const auto* const text = std::get_if<std::string>(&elements[static_cast<std::size_t>(index)]);
     return text == nullptr ? std::nullopt : std::optional(*text);
 }
 

@@ -1,14 +1,15 @@
 #include "operations/PulledRecords.h"
 
 #include <array>
-#include <cstdint>
+#include <cstddef>
 #include <cstring>
 
 namespace cimom::wbem {
 
 namespace {
 
-using Header = std::array<std::uint64_t, 2>;
+// Only the process that writes a record reads it.
+using Header = std::array<std::size_t, 2>;
 
 }  // namespace
 
