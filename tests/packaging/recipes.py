@@ -130,10 +130,14 @@ for name in asked:
     check(subprocess.run(["pkg-config", "--exists", name]).returncode == 0,
           f"BuildRequires: pkg-config does not know {name}")
 
-# Options are those of CMake.
+# Options are those of CMake; what can be left out is what the code knows.
 options = re.findall(r"^(?:option|set)\((\w+) ", cmake, re.MULTILINE)
 given = re.findall(r"-D(\w+)=", " ".join([values["EXTRA_OECMAKE"], *flags.values()]))
 same("options of CMake", [], set(given) - set(options) - {"CMAKE_BUILD_TYPE"})
+sources = values["READ_SOURCES"].split()
+code = (source / "platform/zrcommon/include/zrcommon/BuiltSources.h").read_text()
+same("READ_SOURCES", re.findall(r'"([^"]+)"', re.search(r"sources\{([^}]*)\}", code)[1]), sources)
+same("PACKAGECONFIG", sources + ["small"], flags)
 
 # The files and the packages that they come into.
 components = {"gateway": "cmpi-dhcp-client", "provider": "cmpi-dhcp-client-provider",

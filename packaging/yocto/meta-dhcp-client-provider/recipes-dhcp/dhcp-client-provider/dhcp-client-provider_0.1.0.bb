@@ -26,7 +26,32 @@ inherit cmake features_check pkgconfig systemd
 # For the header of its bus. Its library is loaded where there is one.
 REQUIRED_DISTRO_FEATURES = "systemd"
 
-EXTRA_OECMAKE = "-DCMAKE_BUILD_TYPE=Release -DBUILD_TESTING=OFF -DZR_COMPILED_TOGETHER=ON"
+# What a machine is read from: what an image never has can be left out of the build, such as by
+#   PACKAGECONFIG:remove:pn-dhcp-client-provider = "wicked connman"
+READ_SOURCES = "systemd-networkd NetworkManager wicked connman dhclient dhcpcd udhcpc dhcp6c \
+ipconfig kernel-ip netplan ifupdown ifcfg bus service-processor json-tree"
+PACKAGECONFIG ??= "small ${READ_SOURCES}"
+PACKAGECONFIG[small] = "-DZR_SMALL=ON,-DZR_SMALL=OFF"
+PACKAGECONFIG[systemd-networkd] = ",,"
+PACKAGECONFIG[NetworkManager] = ",,"
+PACKAGECONFIG[wicked] = ",,"
+PACKAGECONFIG[connman] = ",,"
+PACKAGECONFIG[dhclient] = ",,"
+PACKAGECONFIG[dhcpcd] = ",,"
+PACKAGECONFIG[udhcpc] = ",,"
+PACKAGECONFIG[dhcp6c] = ",,"
+PACKAGECONFIG[ipconfig] = ",,"
+PACKAGECONFIG[kernel-ip] = ",,"
+PACKAGECONFIG[netplan] = ",,"
+PACKAGECONFIG[ifupdown] = ",,"
+PACKAGECONFIG[ifcfg] = ",,"
+PACKAGECONFIG[bus] = ",,"
+PACKAGECONFIG[service-processor] = ",,"
+PACKAGECONFIG[json-tree] = ",,"
+
+EXTRA_OECMAKE = "-DCMAKE_BUILD_TYPE=Release -DBUILD_TESTING=OFF -DZR_COMPILED_TOGETHER=ON \
+'-DZR_WITHOUT=${@';'.join(source for source in d.getVar('READ_SOURCES').split() \
+if source not in d.getVar('PACKAGECONFIG').split())}'"
 
 do_install:append() {
     # What Debian's packages have.
@@ -48,7 +73,7 @@ FILES:cmpi-dhcp-client = "${libdir}/cmpi/libDHCPClient.so \
 ${datadir}/dhcp-client-provider/schema/DHCPClient.registration"
 RDEPENDS:cmpi-dhcp-client = "${PN}-schema (= ${EXTENDPKGV})"
 # Loaded where managers are asked on the bus, and not seen by bitbake.
-RRECOMMENDS:cmpi-dhcp-client = "libsystemd"
+RRECOMMENDS:cmpi-dhcp-client = "${@bb.utils.contains('PACKAGECONFIG', 'bus', 'libsystemd', '', d)}"
 
 FILES:cmpi-dhcp-client-provider = "${libdir}/cmpi/libDHCPClientProvider.so \
 ${datadir}/dhcp-client-provider/schema/exact/DHCPClientProvider.registration"
