@@ -7,7 +7,6 @@
 #include "cimom/Names.h"
 #include "cimom/Results.h"
 #include "client/Response.h"
-#include "client/StatusMessage.h"
 #include "text/DisplayText.h"
 #include "tklogger/TKLogger.h"
 #include "zrcommon/LogLevel.h"

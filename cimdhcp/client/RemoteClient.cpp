@@ -13,7 +13,6 @@
 #include "cimxml/OperationRequest.h"
 #include "cimxml/OperationResponse.h"
 #include "client/Response.h"
-#include "client/StatusMessage.h"
 #include "text/DisplayText.h"
 #include "text/ValueMeaning.h"
 

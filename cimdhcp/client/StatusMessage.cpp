@@ -1,8 +1,7 @@
-#include "client/StatusMessage.h"
+#include "client/Response.h"
 
 #include "cimom/ObjectPathText.h"
 #include "cimxml/Errors.h"
-#include "client/Response.h"
 #include "text/DisplayText.h"
 
 namespace cimdhcp {

@@ -23,7 +23,7 @@
 #include "cimom/ObjectManager.h"
 #include "client/EmbeddedClient.h"
 #include "client/MachineInterfaces.h"
-#include "client/StatusMessage.h"
+#include "client/Response.h"
 #include "commands/Fleet.h"
 #include "commands/Interruption.h"
 #include "commands/Overview.h"

@@ -2,7 +2,7 @@
 #include "clients/Connman.h"
 
 #include "Input.h"
-#include "configuration/KernelBoot.h"
+#include "configuration/ConfigurationFiles.h"
 #include "support/Texts.h"
 
 namespace {

@@ -1,5 +1,5 @@
 // ifcfg files, which are shell fragments.
-#include "configuration/Ifcfg.h"
+#include "configuration/ConfigurationFiles.h"
 
 #include "Input.h"
 #include "formats/Assignments.h"

@@ -1,5 +1,5 @@
 // interfaces(5) and the state file of ifupdown.
-#include "configuration/Ifupdown.h"
+#include "configuration/ConfigurationFiles.h"
 
 #include "Input.h"
 #include "support/Texts.h"

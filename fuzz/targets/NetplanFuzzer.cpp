@@ -1,5 +1,5 @@
 // The file that netplan makes for one interface, read from a directory as it lies there.
-#include "configuration/Netplan.h"
+#include "configuration/ConfigurationFiles.h"
 
 #include <unistd.h>
 

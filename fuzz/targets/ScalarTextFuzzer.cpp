@@ -1,7 +1,7 @@
 // A byte that names a type, and the text of a value: of CIM-XML, of a date, and of what
 // a person types.
 #include "cimom/ClassDeclaration.h"
-#include "cimxml/ScalarText.h"
+#include "cimxml/XmlText.h"
 
 #include <cmath>
 

@@ -15,10 +15,7 @@
 #include "clients/Processes.h"
 #include "clients/Udhcpc.h"
 #include "clients/Wicked.h"
-#include "configuration/Ifcfg.h"
-#include "configuration/Ifupdown.h"
-#include "configuration/KernelBoot.h"
-#include "configuration/Netplan.h"
+#include "configuration/ConfigurationFiles.h"
 #include "kernel/Sockets.h"
 
 namespace ZR::Live {

@@ -13,7 +13,7 @@
 #include <vector>
 
 #include "NamespaceMachine.h"
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 #include "kit/Namespaces.h"
 #include "kit/ProviderHost.h"
 #include "kit/Script.h"

@@ -11,7 +11,7 @@
 #include <vector>
 
 #include "kit/Allocations.h"
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 #include "kit/SystemCalls.h"
 
 namespace test {

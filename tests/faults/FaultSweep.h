@@ -7,9 +7,9 @@
 #include <string>
 
 #include "kit/CallOrigin.h"
+#include "kit/Files.h"
 #include "kit/ProviderHost.h"
 #include "kit/Script.h"
-#include "kit/TemporaryDirectory.h"
 #include "kit/TreeMachine.h"
 
 namespace test {

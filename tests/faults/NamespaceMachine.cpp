@@ -3,7 +3,7 @@
 #include <cstdlib>
 #include <filesystem>
 
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 #include "kit/Namespaces.h"
 
 namespace test {

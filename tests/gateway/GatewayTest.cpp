@@ -7,7 +7,7 @@
 #include <sstream>
 
 #include "GatewayFixture.h"
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 
 namespace gateway {
 namespace {

@@ -7,7 +7,7 @@
 #include <filesystem>
 
 #include "GatewayFixture.h"
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 
 namespace gateway {
 namespace {

@@ -7,8 +7,7 @@
 #include <string_view>
 #include <vector>
 
-#include "kit/FileContent.h"
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 #include "tklogger/TKLogger.h"
 
 namespace ZR::Testing {

@@ -7,7 +7,7 @@
 #include <filesystem>
 #include <fstream>
 
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 
 namespace test {
 

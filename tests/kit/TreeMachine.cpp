@@ -4,7 +4,7 @@
 #include <filesystem>
 #include <nlohmann/json.hpp>
 
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 
 namespace test {
 namespace {

@@ -2,7 +2,7 @@
 
 #include <string>
 
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 
 namespace test {
 

@@ -9,8 +9,7 @@
 #include <string>
 #include <utility>
 
-#include "kit/FileContent.h"
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 #include "sources/JsonTree.h"
 #include "zrclient/InstrumentationService.h"
 #include "zrclient/Snapshot.h"

@@ -37,10 +37,9 @@ for type in sfcb pegasus; do
     mkdir "$stage"
     check "$type: registers" env DESTDIR="$stage" "$program" -t "$type"
     content "$stage" >"$directory/content"
-    if [[ ${UPDATE_EXPECTED:-no} == yes ]]; then
-        cp "$directory/content" "$expected/$type"
-    fi
-    check "$type: writes what is expected" diff "$expected/$type" "$directory/content"
+    awk -v wanted="=== $type" '/^=== / { inside = $0 == wanted; next } inside' "$expected" \
+        >"$directory/expected"
+    check "$type: writes what is expected" diff "$directory/expected" "$directory/content"
     find "$stage" -name '1?-dhcp-*.mof' | while read -r file; do
         cmp "$file" "$(dirname "$program")/schema/${file##*/}" || true
     done >"$directory/classes"

@@ -17,7 +17,7 @@
 #include <vector>
 
 #include "Growth.h"
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 #include "kit/PrivateNamespace.h"
 #include "kit/ProviderHost.h"
 #include "kit/Script.h"

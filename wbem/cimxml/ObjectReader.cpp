@@ -7,7 +7,7 @@
 
 #include "cimom/Instance.h"
 #include "cimxml/Errors.h"
-#include "cimxml/ScalarText.h"
+#include "cimxml/XmlText.h"
 
 namespace cimom::wbem {
 

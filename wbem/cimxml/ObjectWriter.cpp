@@ -8,7 +8,6 @@
 #include "cimom/Instance.h"
 #include "cimom/Names.h"
 #include "cimom/ObjectPathText.h"
-#include "cimxml/ScalarText.h"
 #include "cimxml/XmlText.h"
 
 namespace cimom::wbem {

@@ -1,4 +1,4 @@
-#include "cimxml/ScalarText.h"
+#include "cimxml/XmlText.h"
 
 #include <array>
 #include <charconv>
@@ -10,7 +10,6 @@
 #include "cimom/DateTimeText.h"
 #include "cimom/Names.h"
 #include "cimom/Utf8.h"
-#include "cimxml/XmlText.h"
 
 namespace cimom::wbem {
 

@@ -15,7 +15,6 @@
 #include "cimom/Requests.h"
 #include "client/Client.h"
 #include "client/Response.h"
-#include "client/StatusMessage.h"
 #include "text/DisplayText.h"
 
 namespace cimdhcp {

@@ -9,7 +9,6 @@
 #include "cimom/ClassDeclaration.h"
 #include "cimom/ObjectPathText.h"
 #include "client/Response.h"
-#include "client/StatusMessage.h"
 #include "text/Columns.h"
 #include "text/DisplayText.h"
 #include "text/JsonText.h"

@@ -1,4 +1,4 @@
-#include "configuration/Ifcfg.h"
+#include "configuration/ConfigurationFiles.h"
 
 #include <algorithm>
 #include <cstddef>

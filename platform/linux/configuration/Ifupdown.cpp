@@ -1,4 +1,4 @@
-#include "configuration/Ifupdown.h"
+#include "configuration/ConfigurationFiles.h"
 
 #include <fnmatch.h>
 

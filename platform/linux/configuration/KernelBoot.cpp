@@ -1,4 +1,4 @@
-#include "configuration/KernelBoot.h"
+#include "configuration/ConfigurationFiles.h"
 
 #include <algorithm>
 #include <string>

@@ -1,4 +1,4 @@
-#include "configuration/Netplan.h"
+#include "configuration/ConfigurationFiles.h"
 
 #include <string>
 #include <utility>

@@ -8,7 +8,7 @@
 #include <cerrno>
 
 #include "LogLine.h"
-#include "zrcommon/Errno.h"
+#include "zrcommon/File.h"
 #include "zrcommon/LogLevel.h"
 
 namespace TKLog {

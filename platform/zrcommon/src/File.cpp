@@ -94,4 +94,12 @@ std::optional<std::string> File::read(const std::string& path, std::size_t limit
     }
 }
 
+std::string reasonOf(int error) {
+    return std::generic_category().message(error);
+}
+
+bool isAbsent(int error) noexcept {
+    return error == ENOENT || error == ENOTDIR;
+}
+
 }  // namespace ZR

@@ -6,7 +6,6 @@
 #include <cstdlib>
 #include <string_view>
 
-#include "zrcommon/Errno.h"
 #include "zrcommon/File.h"
 #include "zrcommon/PropertyFile.h"
 

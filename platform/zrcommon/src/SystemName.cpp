@@ -5,7 +5,7 @@
 #include <array>
 #include <cerrno>
 
-#include "zrcommon/Errno.h"
+#include "zrcommon/File.h"
 
 namespace ZR {
 

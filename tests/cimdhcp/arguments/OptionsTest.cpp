@@ -11,7 +11,7 @@
 #include "arguments/CommandLine.h"
 #include "arguments/OptionGroups.h"
 #include "client/InterfaceState.h"
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 #include "kit/Refusal.h"
 #include "text/Failure.h"
 

@@ -6,9 +6,8 @@
 #include <unistd.h>
 
 #include "kit/ChildProcess.h"
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 #include "kit/Refusal.h"
-#include "kit/TemporaryDirectory.h"
 #include "text/Failure.h"
 
 namespace cimdhcp {

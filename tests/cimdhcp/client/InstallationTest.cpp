@@ -4,9 +4,8 @@
 
 #include <filesystem>
 
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 #include "kit/Refusal.h"
-#include "kit/TemporaryDirectory.h"
 #include "text/Failure.h"
 
 namespace cimdhcp {

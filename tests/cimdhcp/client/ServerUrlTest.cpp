@@ -5,8 +5,7 @@
 
 #include <sstream>
 
-#include "kit/FileContent.h"
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 #include "text/Failure.h"
 
 namespace cimdhcp {

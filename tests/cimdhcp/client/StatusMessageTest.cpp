@@ -1,10 +1,9 @@
-#include "client/StatusMessage.h"
+#include "client/Response.h"
 
 #include <gtest/gtest.h>
 
 #include "cimom/ObjectPathText.h"
 #include "cimom/Status.h"
-#include "client/Response.h"
 
 namespace cimdhcp {
 namespace {

@@ -5,8 +5,7 @@
 #include <unistd.h>
 
 #include "kit/ChildProcess.h"
-#include "kit/FileContent.h"
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 
 namespace cimdhcp {
 namespace {

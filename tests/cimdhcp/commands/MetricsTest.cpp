@@ -8,8 +8,7 @@
 #include <filesystem>
 
 #include "commands/Exporter.h"
-#include "kit/FileContent.h"
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 #include "text/Failure.h"
 #include "zrclient/NodeLexicon.h"
 

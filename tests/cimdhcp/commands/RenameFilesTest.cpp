@@ -10,8 +10,7 @@
 
 #include "commands/rename/RenameFiles.h"
 #include "kit/ChildProcess.h"
-#include "kit/FileContent.h"
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 #include "text/Failure.h"
 
 namespace cimdhcp {

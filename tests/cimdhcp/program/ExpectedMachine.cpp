@@ -4,7 +4,7 @@
 #include <filesystem>
 #include <regex>
 
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 
 namespace test {
 

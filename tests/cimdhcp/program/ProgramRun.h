@@ -7,8 +7,7 @@
 #include <utility>
 #include <vector>
 
-#include "kit/FileContent.h"
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 
 namespace test {
 

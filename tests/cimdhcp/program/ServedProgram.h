@@ -5,7 +5,7 @@
 #include <string>
 #include <vector>
 
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace test {

@@ -17,8 +17,7 @@
 #include "cimom/Indications.h"
 #include "cimom/Instance.h"
 #include "cimom/ObjectManager.h"
-#include "kit/FileContent.h"
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 #include "kit/TestManager.h"
 
 namespace cimom::test {

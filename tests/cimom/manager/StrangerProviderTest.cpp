@@ -1,7 +1,6 @@
 // A provider of another maker, which relies on its host: what it delivers is not of the
 // source alone, its paths have no keys but properties, and others beside it fail.
-#include "kit/FileContent.h"
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 #include "kit/TestManager.h"
 
 namespace cimom::test {

@@ -23,7 +23,7 @@
 #include "formats/Files.h"
 #include "formats/InterfaceName.h"
 #include "formats/IpAddress.h"
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 #include "zrclient/Snapshot.h"
 #include "zrcommon/File.h"
 

@@ -3,7 +3,7 @@
 
 #include <cstdlib>
 
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 #include "kit/ZrclientSupport.h"
 
 namespace ZR::Testing {

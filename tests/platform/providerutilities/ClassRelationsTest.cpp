@@ -10,7 +10,7 @@
 
 #include "ProviderUtilitiesFixture.h"
 #include "kit/ChildProcess.h"
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 #include "providerutilities/ProviderUtilities.h"
 
 namespace ZR {

@@ -14,10 +14,9 @@
 
 #include "LogSink.h"
 #include "kit/ChildProcess.h"
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 #include "kit/LogCapture.h"
 #include "kit/PrivateNamespace.h"
-#include "kit/TemporaryDirectory.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace TKLog {

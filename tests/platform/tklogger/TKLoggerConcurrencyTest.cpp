@@ -6,9 +6,8 @@
 #include <thread>
 #include <vector>
 
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 #include "kit/LogCapture.h"
-#include "kit/TemporaryDirectory.h"
 #include "tklogger/TKLogger.h"
 
 namespace TKLog {

@@ -11,7 +11,7 @@
 #include <thread>
 #include <vector>
 
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 #include "kit/ZrclientSupport.h"
 #include "sources/JsonTreeSource.h"
 #include "zrclient/InstrumentationService.h"

@@ -12,8 +12,7 @@
 #include <utility>
 
 #include "kit/ChildProcess.h"
-#include "kit/FileContent.h"
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 #include "zrcommon/File.h"
 #include "zrcommon/InterfaceFile.h"
 #include "zrcommon/Strings.h"

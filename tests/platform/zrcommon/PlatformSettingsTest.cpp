@@ -11,9 +11,8 @@
 #include <vector>
 
 #include "kit/ChildProcess.h"
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 #include "kit/PrivateNamespace.h"
-#include "kit/TemporaryDirectory.h"
 #include "zrcommon/PlatformUtilities.h"
 
 namespace ZR {

@@ -5,8 +5,7 @@
 #include <string>
 #include <vector>
 
-#include "kit/FileContent.h"
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 
 namespace ZR {
 

@@ -6,7 +6,7 @@
 #include <filesystem>
 
 #include "cimom/Instance.h"
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 #include "kit/Host.h"
 #include "kit/Tree.h"
 #include "providerutilities/ProviderUtilities.h"

@@ -5,7 +5,7 @@
 
 #include "DHCPClientProvider.h"
 #include "cimom/Instance.h"
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 #include "kit/Host.h"
 #include "kit/LogCapture.h"
 #include "kit/Tree.h"

@@ -25,10 +25,9 @@
 
 #include "Lindows/DHCPSettingData.h"
 #include "kit/ChildProcess.h"
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 #include "kit/LogCapture.h"
 #include "kit/PrivateNamespace.h"
-#include "kit/TemporaryDirectory.h"
 
 namespace {
 

@@ -10,7 +10,7 @@
 #include <thread>
 
 #include "Elements.h"
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 #include "kit/Tree.h"
 
 namespace {

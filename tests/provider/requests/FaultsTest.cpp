@@ -12,7 +12,7 @@
 
 #include "FaultEffect.h"
 #include "Requests.h"
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 #include "kit/LogCapture.h"
 #include "kit/Tree.h"
 

@@ -8,10 +8,9 @@
 #include <filesystem>
 #include <nlohmann/json.hpp>
 
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 #include "kit/ProviderHost.h"
 #include "kit/Script.h"
-#include "kit/TemporaryDirectory.h"
 #include "kit/TreeMachine.h"
 
 namespace test {

@@ -9,7 +9,7 @@
 
 #include "Requests.h"
 #include "kit/AssociationMachine.h"
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 #include "kit/LogCapture.h"
 
 namespace {

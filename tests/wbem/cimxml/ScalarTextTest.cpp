@@ -1,5 +1,5 @@
 #include "cimom/Instance.h"
-#include "cimxml/ScalarText.h"
+#include "cimxml/XmlText.h"
 
 #include <gtest/gtest.h>
 

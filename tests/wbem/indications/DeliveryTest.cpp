@@ -11,10 +11,9 @@
 #include <cstdlib>
 #include <set>
 
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 #include "kit/Listeners.h"
 #include "kit/RawServer.h"
-#include "kit/TemporaryDirectory.h"
 #include "kit/WireSupport.h"
 
 namespace cimom::wbem {

@@ -8,9 +8,9 @@
 #include "cimom/ObjectManager.h"
 #include "cimom/Results.h"
 #include "indications/Subscriptions.h"
+#include "kit/Files.h"
 #include "kit/Listeners.h"
 #include "kit/Namespaces.h"
-#include "kit/TemporaryDirectory.h"
 
 namespace cimom::wbem {
 namespace {

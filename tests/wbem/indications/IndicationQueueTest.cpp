@@ -5,8 +5,7 @@
 
 #include <fstream>
 
-#include "kit/FileContent.h"
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 
 namespace cimom::wbem {
 namespace {

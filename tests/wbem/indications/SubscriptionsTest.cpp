@@ -10,10 +10,9 @@
 #include "cimom/Indications.h"
 #include "cimom/ObjectManager.h"
 #include "cimom/Results.h"
-#include "kit/FileContent.h"
+#include "kit/Files.h"
 #include "kit/Listeners.h"
 #include "kit/RawServer.h"
-#include "kit/TemporaryDirectory.h"
 
 namespace cimom::wbem {
 namespace {

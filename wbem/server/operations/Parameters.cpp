@@ -5,7 +5,7 @@
 #include "cimom/Names.h"
 #include "cimxml/Errors.h"
 #include "cimxml/ObjectReader.h"
-#include "cimxml/ScalarText.h"
+#include "cimxml/XmlText.h"
 
 namespace cimom::wbem {
 

@@ -10,7 +10,6 @@
 #include "tklogger/TKLogger.h"
 #include "zrclient/TreeFile.h"
 #include "zrcommon/BuiltSources.h"
-#include "zrcommon/Errno.h"
 #include "zrcommon/File.h"
 #include "zrcommon/LogLevel.h"
 #include "zrcommon/SystemName.h"

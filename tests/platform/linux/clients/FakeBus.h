@@ -17,7 +17,7 @@
 #include <thread>
 #include <utility>
 
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace ZR::Live {

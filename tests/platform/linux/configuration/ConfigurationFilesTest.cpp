@@ -4,10 +4,7 @@
 #include <sys/stat.h>
 
 #include "LinuxSupport.h"
-#include "configuration/Ifcfg.h"
-#include "configuration/Ifupdown.h"
-#include "configuration/KernelBoot.h"
-#include "configuration/Netplan.h"
+#include "configuration/ConfigurationFiles.h"
 
 namespace ZR::Live {
 namespace {

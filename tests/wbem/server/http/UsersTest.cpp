@@ -6,8 +6,7 @@
 #include <stdexcept>
 
 #include "http/Authenticator.h"
-#include "kit/FileContent.h"
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 #include "wbem/Users.h"
 
 namespace cimom::wbem {

@@ -4,7 +4,7 @@
 
 #include "cimom/Interop.h"
 #include "cimxml/ObjectReader.h"
-#include "kit/TemporaryDirectory.h"
+#include "kit/Files.h"
 #include "kit/WireSupport.h"
 
 namespace cimom::test {
