@@ -11,9 +11,9 @@
 #include <streambuf>
 #include <string>
 
+#include "text/DisplayText.h"
 #include "text/ProgressBar.h"
 #include "text/Style.h"
-#include "text/DisplayText.h"
 #include "zrcommon/UniqueFd.h"
 
 namespace cimdhcp {
