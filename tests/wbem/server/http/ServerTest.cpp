@@ -323,14 +323,18 @@ TEST_F(WbemServer, ServesManyConnectionsAtOnce) {
 }
 
 TEST_F(WbemServer, ServesOthersBesideManySlowClients) {
+    // Whatever a busy machine takes, none of them is too slow.
+    wbem::ServerSettings patient;
+    patient.limits.head = patient.limits.request = std::chrono::minutes(5);
+    TestServer others(patient);
     std::vector<RawClient> slow;
     for (int count = 0; count < 200; ++count) {
-        RawClient& client = slow.emplace_back(server.port());
+        RawClient& client = slow.emplace_back(others.port());
         // Half of them stop within their headers, half within their bodies.
         client.send(good.substr(0, count % 2 == 0 ? 50 : good.size() - 10));
     }
     for (int count = 0; count < 20; ++count) {
-        expectServed();
+        EXPECT_EQ(others.ask(good).body, expected);
     }
     for (std::size_t index = 0; index < slow.size(); ++index) {
         slow[index].send(good.substr(index % 2 == 0 ? 50 : good.size() - 10));
