@@ -119,7 +119,7 @@ RawClient::RawClient(std::uint16_t port, const char* from)
     address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
     address.sin_port = htons(port);
     // Nothing here takes that long, but a test must not hang.
-    const timeval patience{10, 0};
+    const timeval patience{60, 0};
     sockaddr_in own{};
     own.sin_family = AF_INET;
     own.sin_addr.s_addr = ::inet_addr(from);
