@@ -194,31 +194,31 @@ TEST(Trace, BuffersAreAsTheLibraryPrintsThem) {
 /// A point's line stays in the buffer of the helper that makes such lines.
 TEST(Trace, PointsUseTheBuffersOfTheHelpers) {
     const LogCapture capture;
-    const std::string logger = loggerCategory;
-    const TraceSource source{"f", logger};
+    const std::string category = loggerCategory;
+    const TraceSource file{"f", category};
     const char* const plain = trace("f", "a much longer text than what follows", 1, message);
     const char* const withParameters = tracepara("f", "a much longer text too", 1, "", message);
     const char* const text = trace("a much longer name", "f", 1, "a much longer value");
     const char* const number = trace("a much longer name", "f", 1, 1U);
     {
-        const TraceScope scope({source, "g", 5});
+        const TraceScope scope({file, "g", 5});
         EXPECT_EQ(bufferOf(plain), padded("ENTERING: g() in f [Line: 5]"));
     }
     EXPECT_EQ(bufferOf(plain), padded("EXITING: g() in f [Line: 5]"));
-    traceMethod({source, "g", 5});
+    traceMethod({file, "g", 5});
     EXPECT_EQ(bufferOf(plain), padded("METHOD: g() was invoked in f [Line: 5]"));
-    traceMessage({source, "g", 5}, "m");
+    traceMessage({file, "g", 5}, "m");
     EXPECT_EQ(bufferOf(plain), padded("MESSAGE [File: f, Line: 5]: m"));
     {
-        const ParameterScope scope({source, "g", 5}, " a=", 1U);
+        const ParameterScope scope({file, "g", 5}, " a=", 1U);
         EXPECT_EQ(bufferOf(withParameters),
                   padded("ENTERING: g() in f [Line: 5],Parameters List:  a=1"));
     }
     EXPECT_EQ(bufferOf(withParameters),
               padded("EXITING: g() in f [Line: 5],Parameters List:  a=1"));
-    traceVariable({source, "g", 5}, "v", "1");
+    traceVariable({file, "g", 5}, "v", "1");
     EXPECT_EQ(bufferOf(text), padded("VARIABLE: 'v' has Value '1' at line 5 in f"));
-    traceVariable({source, "g", 5}, "v", 1U);
+    traceVariable({file, "g", 5}, "v", 1U);
     EXPECT_EQ(bufferOf(number), padded("VARIABLE: 'v' has Value '1' at line 5 in f"));
 }
 
