@@ -159,8 +159,8 @@ value() {
 
 # kernel_address [INTERFACE]: the IPv4 address that the kernel has, without its length.
 kernel_address() {
-    ip -n "$client" -j -4 address show dev "${1:-eth1}" |
-        jq -r '[.[].addr_info[]? | select(.scope == "global") | .local] | .[0] // empty'
+    ip -n "$client" -4 -oneline address show dev "${1:-eth1}" scope global |
+        sed -nE '1s#.* inet ([0-9.]+)[ /].*#\1#p'
 }
 
 # write_in_client FILE: makes a file on the client's machine of what is given to it.

@@ -75,22 +75,30 @@ facts_of() {
           end' "$1"
 }
 
-# kernel_end: when the kernel will remove the IPv4 address, in seconds since the epoch;
+# read_kernel: what the kernel tells of the current interface now. `kernel` gets it as
+# FACT=PATTERN, and `kernel_end` when its IPv4 address will go, in seconds since the epoch;
 # nothing if it will not.
-kernel_end() {
-    ip -n "$client" -j -4 address show dev "$current" 2>/dev/null | jq -r --argjson now "$(date +%s)" '
-        [.[].addr_info[]? | select(.scope == "global" and .dynamic) | .valid_life_time] | .[0] // empty
-        | . + $now'
+read_kernel() {
+    mapfile -t kernel < <(ip -n "$client" -j address show dev "$current" 2>/dev/null |
+        jq -rs --argjson now "$(date +%s)" '[.[][]? | select(.ifname?)][0] // {}
+            | [.addr_info[]? | select(.family == "inet" and .scope == "global")] as $addresses
+            | "address=" + ($addresses[0].local // "none"),
+              "state=" + (if .operstate == "UP" or .operstate == "UNKNOWN" then "1" else "0" end),
+              ([$addresses[] | select(.dynamic) | .valid_life_time][0] // empty | . + $now)')
+    kernel_end=${kernel[2]:-}
+    kernel=("${kernel[@]:0:2}")
 }
 
-# false_in FILE FACT=PATTERN...: tells each fact of the file that is not so; nothing if all are.
+# false_in FILE FACT=PATTERN...: tells each fact of the tree in the file that is not so; nothing
+# if all are. FILE.facts then has those that are shown.
 false_in() {
-    local file=$1 fact pattern end value
+    local file=$1 fact pattern value
     shift
+    facts_of "$file" >"$file.facts"
     local -A seen=()
     while IFS='=' read -r fact value; do
         seen[$fact]=$value
-    done < <(facts_of "$file")
+    done <"$file.facts"
     if [[ ${seen[link]:-no} == no && " $*" != *" link=no"* ]]; then
         echo "the interface is not there; true is $*"
         return 0
@@ -107,62 +115,60 @@ false_in() {
         echo "servers: ${seen[servers]} although DHCP is ${seen[enabled]}"
     [[ ${seen[address]} != none || ${seen[source]} == @(0|none) || ${seen[lease6]} != none ]] ||
         echo "source: ${seen[source]} of no address"
-    end=$(kernel_end)
-    if [[ -n $end && ${seen[end4]} != none && ${seen[lease4]} != *,* && ${seen[lease4]} != *' - -' ]]; then
-        ((seen[end4] - end <= 3 && end - seen[end4] <= 3)) ||
-            echo "LeaseExpires: the kernel says $end, shown ${seen[end4]}"
+    if [[ -n $kernel_end && ${seen[end4]} != none && ${seen[lease4]} != *,* && ${seen[lease4]} != *' - -' ]]; then
+        ((seen[end4] - kernel_end <= 3 && kernel_end - seen[end4] <= 3)) ||
+            echo "LeaseExpires: the kernel says $kernel_end, shown ${seen[end4]}"
     fi
 }
 
-# instances CLASS PROPERTIES NAMES OPTION...: these properties of those that are named so, one
-# per line; both are words in one text.
-instances() {
-    local class=$1 properties=$2 names=$3
-    shift 3
-    cimdhcp "$@" --format json instances "$class" 2>>"$work/classes.log" |
-        jq -c --arg properties "$properties" --arg names "$names" '($names | split(" ")) as $named
-            | .instances[].properties
-            | select((.Name // .ElementName).value as $name | $named | index([$name]))
-            | .[$properties | split(" ")[]].value | values'
+# classes_of OPTION...: what the classes show of the current interface, as FACT=VALUE.
+classes_of() {
+    local class
+    for class in DHCPProtocolEndpoint DHCPRemoteServiceAccessPoint DHCPSettingData; do
+        cimdhcp "$@" --format json instances "QVXZR_$class" >"$work/$class" 2>>"$work/classes.log" || true
+    done
+    jq -rn --arg name "$current" --slurpfile endpoints "$work/DHCPProtocolEndpoint" \
+        --slurpfile servers "$work/DHCPRemoteServiceAccessPoint" \
+        --slurpfile settings "$work/DHCPSettingData" '
+        def named($names): .[].instances[]?.properties
+            | select((.Name // .ElementName).value as $each | $names | index([$each]));
+        def shown: [.[] | values | tostring] | join(" ");
+        "endpoint=" + ([$endpoints | named([$name]) | .EnabledState.value, .ClientState.value] | shown),
+        "servers=" + ([$servers | named([$name + "_IPv4", $name + "_IPv6"]) | .AccessInfo.value | values]
+            | join(",")),
+        "setting=" + ([$settings | named([$name]) | .RequestedIPv4Address.value] | shown)'
 }
-# false_classes FILE OPTION...: as false_in, of the classes against the tree in the file.
+# false_classes FILE OPTION...: as false_in, of the classes against FILE.facts.
 false_classes() {
-    local file=$1 fact value expected servers=''
+    local file=$1 fact value expected
     shift
-    local -A seen=()
+    local -A seen=() classes=()
     while IFS='=' read -r fact value; do
         seen[$fact]=$value
-    done < <(facts_of "$file")
+    done <"$file.facts"
     [[ ${seen[link]:-no} == yes ]] || return 0
+    while IFS='=' read -r fact value; do
+        classes[$fact]=$value
+    done < <(classes_of "$@")
     expected=
     # Enabled and bound; else disabled and unknown.
     [[ ${seen[enabled]} != true ]] || case ${seen[source]}${seen[state]} in
         11) expected='2 8' ;;
         *) expected='3 0' ;;
     esac
-    value=$(instances QVXZR_DHCPProtocolEndpoint 'EnabledState ClientState' "$current" "$@")
-    value=${value//$'\n'/ }
+    value=${classes[endpoint]-no response}
     [[ $value == "$expected" ]] || echo "endpoint: true is '$expected', shown '$value'"
-    servers=$(instances QVXZR_DHCPRemoteServiceAccessPoint AccessInfo \
-        "${current}_IPv4 ${current}_IPv6" "$@" | jq -rs 'join(",")')
-    [[ ${servers:-none} == "${seen[servers]}" ]] || echo "access points: true is ${seen[servers]}, shown $servers"
-    value=$(instances QVXZR_DHCPSettingData RequestedIPv4Address "$current" "$@" | jq -r .)
+    value=${classes[servers]-no response}
+    [[ ${value:-none} == "${seen[servers]}" ]] || echo "access points: true is ${seen[servers]}, shown $value"
+    value=${classes[setting]-no response}
     [[ ${value:-none} == "${seen[address]}" || ${seen[enabled]} != true ]] ||
         echo "setting data: true is ${seen[address]}, shown ${value:-none}"
 }
 
-# kernel_facts: what the kernel tells of the current interface, as FACT=PATTERN in lines.
-kernel_facts() {
-    local address state=0 operstate
-    address=$(kernel_address "$current" 2>/dev/null) || true
-    operstate=$(ip -n "$client" -j link show dev "$current" 2>/dev/null | jq -r '.[0].operstate')
-    [[ $operstate != @(UP|UNKNOWN) ]] || state=1
-    printf '%s\n' "address=${address:-none}" "state=$state"
-}
 # compare FACT=PATTERN...: what is false now goes to $work/false; the status is 1 if anything is.
 compare() {
-    local -a facts=("$@") kernel=()
-    mapfile -t kernel < <(kernel_facts)
+    local -a facts=("$@")
+    read_kernel
     : >"$work/classes.log"
     [[ " $*" == *" link=no"* ]] || facts+=("${kernel[@]}")
     {
@@ -180,8 +186,7 @@ compare() {
 }
 
 compare_now() {
-    local -a kernel=()
-    mapfile -t kernel < <(kernel_facts)
+    read_kernel
     {
         cimdhcp tree >"$work/fresh.json" 2>"$work/fresh.log" || echo "no tree"
         false_in "$work/fresh.json" "$@" "${kernel[@]}"
