@@ -183,7 +183,7 @@ void markProviderEntry(const std::string& logger, const char* file, const char* 
     const TraceSource source{markFile, logger};
     writeSeparator(ZR_HERE);
     TKLog::TKMessageBuffer rest;
-    TraceText::describe(rest, file, function, line);
+    TraceText::describe(rest, TraceText::of(file), TraceText::of(function), line);
     writeLine(ZR_HERE, flowLevel, TraceText::plain(entering, rest.str()));
 }
 
@@ -191,7 +191,7 @@ void markProviderExit(const std::string& logger, const char* file, const char* f
                       unsigned line) {
     const TraceSource source{markFile, logger};
     TKLog::TKMessageBuffer rest;
-    TraceText::describe(rest, file, function, line);
+    TraceText::describe(rest, TraceText::of(file), TraceText::of(function), line);
     writeLine(ZR_HERE, flowLevel, TraceText::plain(exiting, rest.str()));
     writeSeparator(ZR_HERE);
 }
