@@ -20,7 +20,7 @@ namespace ZR::DHCPClientGateway {
 
 namespace {
 
-std::atomic<const CMPIBroker*> broker = nullptr;
+std::atomic<const CMPIBroker*> loadingBroker = nullptr;
 
 CMPIStatus statusOf(const CMPIBroker* host, CMPIrc code, const char* message) {
     return {code, host->eft->newString(host, message, nullptr)};
@@ -31,7 +31,7 @@ CMPIStatus statusOf(const CMPIBroker* host, CMPIrc code, const char* message) {
 template <typename Serve>
 CMPIStatus serve(const CMPIContext* context, const CMPIResult* result, const CMPIObjectPath* path,
                  const Serve& operation) {
-    const CMPIBroker* host = broker;
+    const CMPIBroker* host = loadingBroker;
     const OneMoment moment;
     try {
         operation(Request{host, context, result, path, ProviderUtilities::getNamespace(path)});
@@ -45,7 +45,7 @@ CMPIStatus serve(const CMPIContext* context, const CMPIResult* result, const CMP
 }
 
 CMPIStatus refuse(const char* message) {
-    return statusOf(broker, CMPI_RC_ERR_NOT_SUPPORTED, message);
+    return statusOf(loadingBroker, CMPI_RC_ERR_NOT_SUPPORTED, message);
 }
 
 CMPIStatus cleanup(CMPIInstanceMI* /*mi*/, const CMPIContext* /*ctx*/,
@@ -164,7 +164,7 @@ constexpr CMPIAssociationMIFT associationTable{
 
 /// Both kinds of requests ask the instances of the exact provider.
 void prepare(const CMPIBroker* host, const CMPIContext* context, CMPIStatus* status) {
-    broker = host;
+    loadingBroker = host;
     useExactProvider(DHCPClientProvider_Create_InstanceMI(host, context, status));
 }
 
