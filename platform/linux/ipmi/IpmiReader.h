@@ -8,6 +8,7 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 #include "formats/Files.h"
@@ -79,7 +80,7 @@ class IpmiReader {
 /// In its place in a build that does not read service processors.
 class NoIpmiReader {
   public:
-    explicit NoIpmiReader(const Roots& roots) : roots_(roots) {}
+    explicit NoIpmiReader(Roots roots) : roots_(std::move(roots)) {}
 
     [[nodiscard]] static bool changed() noexcept { return false; }
     [[nodiscard]] static bool awaiting() noexcept { return false; }

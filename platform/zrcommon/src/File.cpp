@@ -7,6 +7,7 @@
 #include <algorithm>
 #include <cerrno>
 #include <cstdint>
+#include <system_error>
 
 #include "zrcommon/Strings.h"
 #include "zrcommon/UniqueFd.h"

@@ -64,7 +64,7 @@ const char* applySink(std::string_view value, PlatformSettings& settings) {
 
 const char* applyReadOnce(std::string_view value, PlatformSettings& settings) {
     settings.readOnce = value == "yes";
-    return value == "yes" || value == "no" ? nullptr : "not \"yes\" or \"no\"";
+    return value == "yes" || value == "no" ? nullptr : R"(not "yes" or "no")";
 }
 
 const char* applyDataDir(std::string_view value, PlatformSettings& settings) {

@@ -14,6 +14,7 @@
 namespace ZR::Built {
 
 /// What the build is without, as the option has it.
+// NOLINTNEXTLINE(readability-redundant-string-init): empty in most builds only
 inline constexpr std::string_view leftOut = ZR_WITHOUT;
 
 /// What a machine is read from, each by the name under which a build can be without it.
