@@ -165,9 +165,10 @@ class Served {
                     "localhost"}) {
         cimom::wbem::ServerSettings settings;
         settings.port = 0;
-        // All clients here have one address.
+        // All clients here have one address, and none of them is to be refused.
         settings.limits.connectionsEach = settings.limits.connections;
         settings.limits.connectionRate = settings.limits.connections;
+        settings.limits.memory *= 8;
         server_ = std::make_unique<cimom::wbem::Server>(
             manager_, settings, [](cimom::wbem::LogKind, const std::string&) {});
     }

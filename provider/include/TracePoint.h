@@ -33,7 +33,7 @@ struct TracePoint {
 
 /// A line's number, made when the program is compiled.
 consteval LineNumber constantLine(unsigned line) {
-    return LineNumber(line);
+    return {line};
 }
 
 /// This function and line of the file whose TraceSource is called `source`.
