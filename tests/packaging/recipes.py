@@ -100,7 +100,7 @@ for name, body in functions.items():
         done = subprocess.run(["sh", "-n"], input=body, text=True, capture_output=True)
         check(done.returncode == 0, f"{recipe.name}: {name}(): {done.stderr}")
 
-# What CMake looks for is what the recipe and the spec file ask for.
+# What CMake looks for is what the recipe and the RPM packages ask for.
 found = set()
 for path in source.rglob("CMakeLists.txt"):
     below = path.relative_to(source).parts[0]

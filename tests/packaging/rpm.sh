@@ -36,7 +36,7 @@ fi
 version=$(rpmspec "${load[@]}" -q --srpm --qf '%{VERSION}' "$spec")
 project=$(sed -nE 's/^project\(.* VERSION ([0-9.]+).*/\1/p' "$source/CMakeLists.txt")
 if [[ $version != "$project" ]]; then
-    echo "The spec file has version $version, and CMakeLists.txt $project."
+    echo "The RPM packages have version $version, and CMakeLists.txt $project."
     exit 1
 fi
 
@@ -71,7 +71,7 @@ if [[ -n $whole ]]; then
     build=$(find "$whole/BUILD" -maxdepth 3 -name CMakeCache.txt -printf '%h\n')
 fi
 
-# Stripped by the spec's own steps, and compressed quickly.
+# Stripped by rpmbuild's own steps, and compressed quickly.
 libraries=$(sed -n 's/^CMAKE_INSTALL_LIBDIR:.*=//p' "$build/CMakeCache.txt")
 packages() { # SPEC TOP
     make_packages "$1" "$2" -bb --define "built $build" --define "_lib $libraries" \
